@@ -1,0 +1,66 @@
+#include "SharedDependencies/CreatorAttributes.h"
+
+#include <algorithm>
+#include <cstring>
+#include <iterator>
+#include <string_view>
+
+namespace ZULMetaData {
+
+namespace {
+
+bool isContinuationByte(char c) {
+    return (static_cast<unsigned char>(c) & 0xc0) == 0x80;
+}
+
+std::size_t lengthCutAtCharacter(std::string_view text, std::size_t limit) {
+    if (text.size() <= limit)
+        return text.size();
+    while (limit > 0 && isContinuationByte(text[limit]))
+        --limit;
+    return limit;
+}
+
+template <std::size_t Size>
+void store(const std::string& text, char (&field)[Size]) {
+    std::fill(std::begin(field), std::end(field), '\0');
+    std::memcpy(field, text.data(), lengthCutAtCharacter(text, Size - 1));
+}
+
+/// Stays inside the field even where a record read from disk lacks its zero byte.
+template <std::size_t Size>
+std::string load(const char (&field)[Size]) {
+    return {std::begin(field), std::find(std::begin(field), std::end(field), '\0')};
+}
+
+} // namespace
+
+void CreatorAttributes::setName(const std::string& name) {
+    store(name, name_);
+}
+
+void CreatorAttributes::setVersion(const std::string& version) {
+    store(version, version_);
+}
+
+void CreatorAttributes::setPlatformVersion(const std::string& platformVersion) {
+    store(platformVersion, platformVersion_);
+}
+
+std::string CreatorAttributes::name() const {
+    return load(name_);
+}
+
+std::string CreatorAttributes::version() const {
+    return load(version_);
+}
+
+std::string CreatorAttributes::platformVersion() const {
+    return load(platformVersion_);
+}
+
+std::string CreatorAttributes::platformNameMac() {
+    return "Mac";
+}
+
+} // namespace ZULMetaData

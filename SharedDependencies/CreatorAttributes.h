@@ -1,0 +1,35 @@
+#pragma once
+
+// Who made a recording: the 56-byte creator record of a movie's recording info.
+
+#include <cstddef>
+#include <string>
+#include <type_traits>
+
+namespace ZULMetaData {
+
+/// Three texts in fixed fields, written to disk as they lie in memory: name (24 bytes), version (16) and
+/// platform version (16). Each is UTF-8 and always ends with a zero byte; a text too long for its field is cut
+/// behind its last whole character.
+class CreatorAttributes {
+public:
+    void setName(const std::string& name);
+    void setVersion(const std::string& version);
+    void setPlatformVersion(const std::string& platformVersion);
+
+    std::string name() const;
+    std::string version() const;
+    std::string platformVersion() const;
+
+    static std::string platformNameMac();
+
+private:
+    char name_[24] = {};
+    char version_[16] = {};
+    char platformVersion_[16] = {};
+};
+
+static_assert(sizeof(CreatorAttributes) == 56);
+static_assert(std::is_trivially_copyable_v<CreatorAttributes>);
+
+} // namespace ZULMetaData

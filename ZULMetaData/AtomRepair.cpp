@@ -1,0 +1,97 @@
+#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/PositionedInput.h"
+#include "ZULMetaData/ZULMMetaDataParser.h"
+
+#include <fstream>
+#include <span>
+
+namespace ZULMetaData {
+
+namespace {
+
+struct Atom {
+    std::uint64_t start = 0;
+    std::uint64_t size = 0;
+    std::uint32_t type = 0;
+    bool isExtended = false;
+};
+
+bool overwrite(std::fstream& movie, std::uint64_t position, std::span<const char> bytes) {
+    seekWritePos(movie, static_cast<std::int64_t>(position));
+    movie.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+    movie.flush();
+    return movie.good();
+}
+
+/// Only the 32-bit size 1 announces an extended one here, unlike in the scan.
+bool readAtom(detail::PositionedInput& input, Atom& atom) {
+    std::uint32_t shortSize = 0;
+    atom.start = input.position();
+    if (!input.enoughBytesLeft(detail::s_atomHeaderSize) || !input.readBigEndian(shortSize) ||
+        !input.readBigEndian(atom.type))
+        return false;
+    atom.size = shortSize;
+    atom.isExtended = shortSize == detail::s_extendedSizeMarker;
+    return !atom.isExtended || input.readBigEndian(atom.size);
+}
+
+/// `last` reaches to the end of the movie, `remaining` bytes on, and `previous` stands in front of it.
+bool closeOpenAtom(std::fstream& movie, const Atom& last, const Atom& previous, std::uint64_t remaining) {
+    if (last.isExtended) // what an interrupted append leaves behind
+        return overwrite(movie, last.start + detail::s_extendedSizeOffset, detail::bigEndianBytes(remaining));
+    if (remaining <= 0xffffffff)
+        return overwrite(movie, last.start, detail::bigEndianBytes(static_cast<std::uint32_t>(remaining)));
+    if (previous.size != detail::s_atomHeaderSize || previous.type != detail::s_spareAtom)
+        return false;
+    // The length stays what it was without the spare bytes that the header now begins in.
+    return overwrite(movie, last.start - detail::s_atomHeaderSize, detail::extendedAtomHeader(last.type, remaining));
+}
+
+} // namespace
+
+bool Util::finalizeAtomsInFile(const std::string& path) {
+    std::fstream movie;
+    fileOpen(movie, path.c_str(), std::ios_base::in | std::ios_base::out | std::ios_base::binary);
+    if (!movie.is_open())
+        return false;
+    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(movie));
+    detail::PositionedInput input(movie, 0, total);
+    Atom previous;
+    while (input.position() < total) {
+        Atom atom;
+        if (!readAtom(input, atom))
+            return false;
+        if (atom.size == 0)
+            return closeOpenAtom(movie, atom, previous, total - atom.start);
+        const std::uint64_t end = atom.start + atom.size;
+        if (end <= atom.start || !input.moveTo(end))
+            return false;
+        previous = atom;
+    }
+    return input.position() == total;
+}
+
+namespace {
+
+class RecordingScaleDataObserver final : public DataStreamObserver<double> {
+public:
+    bool dataRead(double, const double& value) override {
+        scale_ = value;
+        return true;
+    }
+    double scale() const { return scale_; }
+
+private:
+    double scale_ = 1.0;
+};
+
+} // namespace
+
+double Util::recordingScaleForMP4AtPath(const std::string& path) {
+    RecordingScaleDataObserver observer;
+    if (const auto parser = MetaDataParser::create(path))
+        parser->loadDataType<double>(s_recordingScaleFactorUUID, observer, -1);
+    return observer.scale();
+}
+
+} // namespace ZULMetaData

@@ -1,0 +1,28 @@
+#include "ZULMetaData/AtomWriting.h"
+
+#include "ZULMetaData/AtomFormat.h"
+
+namespace ZULMetaData::detail {
+
+OpenAtom beginAtom(std::ofstream& movie, std::uint32_t type) {
+    movie.seekp(0, std::ios_base::end);
+    const std::int64_t start = toInt64(movie.tellp());
+    const auto header = extendedAtomHeader(type, 0);
+    movie.write(header.data(), header.size());
+    return {start, start < 0 ? start : start + static_cast<std::int64_t>(s_extendedSizeOffset)};
+}
+
+std::uint64_t endAtom(std::ofstream& movie, const OpenAtom& atom) {
+    const std::int64_t end = toInt64(movie.tellp());
+    movie.close();
+    return static_cast<std::uint64_t>(end) - static_cast<std::uint64_t>(atom.start);
+}
+
+void writeAtomSize(std::fstream& movie, std::int64_t sizeField, std::uint64_t size) {
+    seekWritePos(movie, sizeField);
+    const auto bytes = bigEndianBytes(size);
+    movie.write(bytes.data(), bytes.size());
+    movie.close();
+}
+
+} // namespace ZULMetaData::detail

@@ -1,0 +1,22 @@
+#pragma once
+
+// Finds the metadata streams of a container by walking its headers; the media in between is never read.
+
+#include "ZULMetaData/ZULMMetaDataParser.h"
+
+#include <istream>
+#include <map>
+
+namespace ZULMetaData::detail {
+
+using StreamCache = std::map<uuid, MetaDataParser::CachedFileData>;
+
+/// The scans begin at the start of `stream`, which holds `total` bytes. A malformed container ends the scan with
+/// what was found so far. Where two streams are of one kind, the later one counts.
+void scanAtoms(std::istream& stream, std::uint64_t total, StreamCache& found);
+void scanChunks(std::istream& stream, std::uint64_t total, StreamCache& found);
+
+/// The whole file is one stream, however short it is.
+void scanRawStream(std::istream& stream, std::uint64_t total, StreamCache& found);
+
+} // namespace ZULMetaData::detail

@@ -1,0 +1,141 @@
+#include "ZULMetaData/CursorImageWriter.h"
+
+#include "ZULMetaData/InvalidEntry.h"
+
+#include <istream>
+#include <ostream>
+
+namespace ZULMetaData {
+
+void CursorImageWriter::Write(std::ostream& stream, const FieldInfo& field) {
+    if (field.data)
+        stream.write(reinterpret_cast<const char*>(field.data), field.size);
+    else // memory for an image without bytes ran out: it would have been zeros
+        for (std::uint32_t written = 0; written < field.size; ++written)
+            stream.put('\0');
+    bytesWritten_ += field.size;
+}
+
+void CursorImageWriter::WriteCursorImageMetaData(std::ostream& stream, const CursorImageSchema& schema,
+                                                 Record& record) {
+    bytesWritten_ = 0;
+    schema.CalculateMetadataSizes(record);
+    WriteBaseInfo(stream, schema, record);
+    WriteMetaDataFields(stream, schema, record);
+}
+
+void CursorImageWriter::WriteBaseInfo(std::ostream& stream, const CursorImageSchema& schema, Record& record) {
+    writeSteps(stream, schema.GetBaseInfoSteps(), record);
+}
+
+void CursorImageWriter::WriteMetaDataFields(std::ostream& stream, const CursorImageSchema& schema, Record& record) {
+    writeSteps(stream, schema.GetDataSteps(), record);
+}
+
+void CursorImageWriter::writeSteps(std::ostream& stream, CursorImageSchema::Steps steps, Record& record) {
+    for (const SchemaFieldStep& step : steps)
+        if (step.existsIn(version_) && step.condition(record))
+            Write(stream, step.fieldGetter(record));
+}
+
+void CursorImageReader::Read(std::istream& stream, const FieldInfo& field) {
+    if (field.size != 0)
+        stream.read(reinterpret_cast<char*>(field.data), field.size);
+    if (bytesLeft_ >= field.size)
+        bytesLeft_ -= field.size;
+}
+
+void CursorImageReader::ReadCursorImageMetaData(std::istream& stream, const CursorImageSchema& schema, Record& record) {
+    ReadBaseInfo(stream, schema, record);
+    ReadMetaDataFields(stream, schema, record);
+}
+
+void CursorImageReader::ReadBaseInfo(std::istream& stream, const CursorImageSchema& schema, Record& record) {
+    for (const SchemaFieldStep& step : schema.GetBaseInfoSteps()) {
+        detail::throwIfInputEnded(stream);
+        if (step.existsIn(version_) && step.condition(record))
+            Read(stream, step.fieldGetter(record));
+    }
+}
+
+void CursorImageReader::ReadMetaDataFields(std::istream& stream, const CursorImageSchema& schema, Record& record) {
+    bytesLeft_ = record.justMetadataSize;
+    record.image.freeImageData(true);
+    for (const SchemaFieldStep& step : schema.GetDataSteps()) {
+        if (bytesLeft_ == 0)
+            break;
+        if (!step.existsIn(version_) || !step.condition(record))
+            continue;
+        const bool isImage = step.fieldGetter == schema.GetImageFieldInfoFn();
+        if (isImage ? !readImage(stream, schema, record) : !readField(stream, step.fieldGetter(record)))
+            break;
+    }
+    if (!detail::inputEnded(stream))
+        IgnoreLeftoverBytes(stream, bytesLeft_);
+}
+
+/// Asks for no memory before the image is known to fit.
+bool CursorImageReader::readImage(std::istream& stream, const CursorImageSchema& schema, Record& record) {
+    const bool fits = schema.GetImageSize(record) <= bytesLeft_ && !detail::inputEnded(stream);
+    if (fits && readField(stream, schema.GetImageFieldInfoFn()(record)))
+        return true;
+    record.image.freeImageData(true);
+    return false;
+}
+
+bool CursorImageReader::readField(std::istream& stream, const FieldInfo& field) {
+    const bool outOfMemory = !field.data && field.size != 0;
+    if (detail::inputEnded(stream) || bytesLeft_ < field.size || outOfMemory)
+        return false;
+    Read(stream, field);
+    return true;
+}
+
+void CursorImageReader::IgnoreLeftoverBytes(std::istream& stream, std::uint32_t count) {
+    if (count != 0)
+        stream.ignore(count);
+}
+
+namespace detail {
+
+namespace {
+
+/// Lets a constant image pass through the schema, which takes and may complete mutable ones, without copying
+/// its bytes. They stay the original's; a buffer that the schema added is freed.
+class ImageView {
+public:
+    explicit ImageView(const CursorImage& original)
+        : borrowed_(original.imageData),
+          image_(original.uniqueId, original.hotspotOffsetX, original.hotspotOffsetY, original.imageData,
+                 original.imageDataSize, original.cursorTypeId, original.flags) {}
+    ImageView(const ImageView&) = delete;
+    ImageView& operator=(const ImageView&) = delete;
+    ~ImageView() { image_.freeImageData(image_.imageData != borrowed_); }
+
+    CursorImage& image() { return image_; }
+
+private:
+    const unsigned char* borrowed_;
+    CursorImage image_;
+};
+
+} // namespace
+
+void writeCursorImageEntry(double time, const CursorImage& image, std::ostream& stream, int version) {
+    const CursorImageSchema schema(version);
+    ImageView view(image);
+    Record record{view.image(), time};
+    metaDataWriteWithSchema(schema, record, stream, version);
+}
+
+std::uint64_t readCursorImageEntry(std::istream& stream, double& time, CursorImage& image, int version) {
+    const CursorImageSchema schema(version);
+    Record record{image, time};
+    CursorImageReader(version).ReadCursorImageMetaData(stream, schema, record);
+    const std::uint64_t baseInfoSize = schema.GetSizeOfSchemaFieldSteps(schema.GetBaseInfoSteps(), record);
+    return baseInfoSize + record.justMetadataSize;
+}
+
+} // namespace detail
+
+} // namespace ZULMetaData

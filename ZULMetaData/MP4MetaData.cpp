@@ -1,0 +1,122 @@
+#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/AtomWriting.h"
+#include "ZULMetaData/PositionedInput.h"
+#include "ZULMetaData/ZULMMetaDataParser.h"
+
+#include <algorithm>
+#include <array>
+#include <fstream>
+#include <iostream>
+#include <sstream>
+#include <stdexcept>
+
+namespace ZULMetaData {
+
+namespace {
+
+constexpr std::size_t s_copySize = 2048;
+
+/// The end of the last whole entry, of entries that begin with their size. Where not even the first is whole, all
+/// of it counts, unless its size itself is torn.
+std::uint64_t endOfSizedEntries(detail::PositionedInput& input) {
+    std::uint64_t end = s_metaDataHeaderSize;
+    while (input.position() < input.total()) {
+        std::uint32_t size = 0;
+        if (!input.read(&size, sizeof size))
+            return end;
+        if (size == 0)
+            throw std::runtime_error("Got an entry size of 0");
+        if (input.total() - input.position() < size)
+            return end == s_metaDataHeaderSize ? input.total() : end;
+        end = input.position() + size;
+        input.moveTo(end);
+    }
+    return end;
+}
+
+/// How much of a stream of `total` bytes, which stands at its start, is worth copying: up to its last whole
+/// entry. Nothing where it has no header.
+std::uint64_t endOfWholeEntries(std::istream& stream, std::uint64_t total) {
+    detail::PositionedInput input(stream, 0, total);
+    MetaDataHeader header;
+    if (!input.read(&header, sizeof header))
+        return 0;
+    if (header.fixedEntrySize == 0)
+        return endOfSizedEntries(input);
+    const std::uint64_t entries = (total - sizeof header) / header.fixedEntrySize;
+    return sizeof header + entries * header.fixedEntrySize;
+}
+
+void copyBytes(std::istream& from, std::ostream& to, std::uint64_t count) {
+    std::array<char, s_copySize> piece;
+    while (count > 0 && from.good()) {
+        from.read(piece.data(), static_cast<std::streamsize>(std::min<std::uint64_t>(count, piece.size())));
+        to.write(piece.data(), from.gcount());
+        count -= static_cast<std::uint64_t>(from.gcount());
+    }
+}
+
+/// The size in the atom is the stream's whole size, torn tail included.
+void writeStream(std::ostream& movie, std::istream& stream) {
+    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+    const std::uint64_t end = endOfWholeEntries(stream, total);
+    if (end == 0)
+        return;
+    const auto header = detail::extendedAtomHeader(detail::s_streamAtom, total + detail::s_extendedAtomHeaderSize);
+    movie.write(header.data(), header.size());
+    stream.clear();
+    stream.seekg(0);
+    copyBytes(stream, movie, end);
+}
+
+bool writeStreamFile(std::ostream& movie, const std::string& moviePath, const std::string& path) {
+    std::ifstream file;
+    fileOpen(file, path.c_str(), std::ios_base::in | std::ios_base::binary);
+    if (!file.is_open() || !file.good()) {
+        std::cout << "Couldn't open meta data file: " << moviePath << '\n'; // names the movie, not the file
+        return false;
+    }
+    writeStream(movie, file);
+    return true;
+}
+
+void finishAtom(std::ofstream& movie, const detail::OpenAtom& atom, const std::string& path) {
+    const std::uint64_t size = detail::endAtom(movie, atom);
+    std::fstream patch;
+    fileOpen(patch, path.c_str(), std::ios_base::in | std::ios_base::out | std::ios_base::binary);
+    detail::writeAtomSize(patch, atom.sizeField, size);
+}
+
+std::ofstream openForAppending(const std::string& path) {
+    std::ofstream movie;
+    fileOpen(movie, path.c_str(), std::ios_base::app | std::ios_base::binary | std::ios_base::out);
+    return movie;
+}
+
+} // namespace
+
+bool MP4MetaData::appendMetaDataFiles(const std::string& path, const std::vector<std::string>& files) {
+    std::ofstream movie = openForAppending(path);
+    if (!movie.is_open() || !movie.good()) {
+        std::cout << "Couldn't open output file for appending meta data: " << path << std::endl;
+        return false;
+    }
+    const detail::OpenAtom atom = detail::beginAtom(movie, detail::s_metaDataAtom);
+    bool allWritten = true;
+    for (const std::string& file : files)
+        allWritten &= writeStreamFile(movie, path, file);
+    finishAtom(movie, atom, path);
+    return allWritten;
+}
+
+void MP4MetaData::appendMetaData(const std::string& path, const std::map<uuid, std::string>& streams) {
+    std::ofstream movie = openForAppending(path);
+    const detail::OpenAtom atom = detail::beginAtom(movie, detail::s_metaDataAtom);
+    for (const auto& [type, bytes] : streams) {
+        std::stringstream stream(bytes);
+        writeStream(movie, stream);
+    }
+    finishAtom(movie, atom, path);
+}
+
+} // namespace ZULMetaData

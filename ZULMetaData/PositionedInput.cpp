@@ -1,0 +1,72 @@
+#include "ZULMetaData/PositionedInput.h"
+
+#include "ZULMetaData/AtomFormat.h"
+
+#include <limits>
+
+namespace ZULMetaData::detail {
+
+namespace {
+
+/// Seeking a file throws its buffer away: shorter distances are cheaper read over.
+constexpr std::uint64_t s_readOverLimit = 2048;
+
+constexpr std::uint64_t s_lastPosition = std::numeric_limits<std::streamoff>::max();
+
+} // namespace
+
+bool PositionedInput::moveTo(std::uint64_t target) {
+    if (target > s_lastPosition)
+        return false;
+    position_ = target;
+    return true;
+}
+
+void PositionedInput::catchUp() {
+    const std::uint64_t distance = position_ - streamPosition_; // huge where the way leads back
+    if (distance == 0)
+        return;
+    if (distance <= s_readOverLimit)
+        stream_.ignore(static_cast<std::streamsize>(distance));
+    else
+        stream_.seekg(static_cast<std::streamoff>(position_));
+    streamPosition_ = position_;
+}
+
+bool PositionedInput::read(void* bytes, std::size_t size) {
+    if (!enoughBytesLeft(size))
+        return false;
+    catchUp();
+    stream_.read(static_cast<char*>(bytes), static_cast<std::streamsize>(size));
+    const auto got = static_cast<std::uint64_t>(stream_.gcount());
+    position_ = streamPosition_ += got;
+    return got == size;
+}
+
+bool PositionedInput::readBigEndian(std::uint32_t& value) {
+    if (!read(&value, sizeof value))
+        return false;
+    value = swapInt(value);
+    return true;
+}
+
+bool PositionedInput::readBigEndian(std::uint64_t& value) {
+    if (!read(&value, sizeof value))
+        return false;
+    value = swapInt(value);
+    return true;
+}
+
+bool PositionedInput::readAtomSizeAndType(std::uint64_t& size, std::uint32_t& type) {
+    std::uint32_t shortSize = 0;
+    if (!enoughBytesLeft(s_atomHeaderSize) || !readBigEndian(shortSize) || !readBigEndian(type))
+        return false;
+    size = shortSize;
+    return shortSize >= s_atomHeaderSize || readBigEndian(size);
+}
+
+bool PositionedInput::readChunkTypeAndSize(std::uint32_t& type, std::uint32_t& size) {
+    return read(&type, sizeof type) && read(&size, sizeof size);
+}
+
+} // namespace ZULMetaData::detail

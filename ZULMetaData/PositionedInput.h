@@ -1,0 +1,46 @@
+#pragma once
+
+// An input stream whose position is counted instead of asked for, bounded by the size of its file.
+
+#include <cstddef>
+#include <cstdint>
+#include <istream>
+
+namespace ZULMetaData::detail {
+
+/// Uses a stream of the caller. Moving costs nothing; the stream follows when the next bytes are read.
+class PositionedInput {
+public:
+    /// `position` is where the stream stands.
+    PositionedInput(std::istream& stream, std::uint64_t position, std::uint64_t total)
+        : stream_(stream), streamPosition_(position), position_(position), total_(total) {}
+
+    std::uint64_t position() const { return position_; }
+    std::uint64_t total() const { return total_; }
+    bool enoughBytesLeft(std::uint64_t needed) const { return total_ >= needed && position_ <= total_ - needed; }
+
+    /// False, leaving the position, where no file position can hold `target`.
+    bool moveTo(std::uint64_t target);
+
+    /// Reads exactly `size` bytes. False where they reach beyond the total or fail to come.
+    bool read(void* bytes, std::size_t size);
+
+    bool readBigEndian(std::uint32_t& value);
+    bool readBigEndian(std::uint64_t& value);
+
+    /// Any 32-bit size below 8 announces an extended size. `size` counts the whole atom, header included.
+    bool readAtomSizeAndType(std::uint64_t& size, std::uint32_t& type);
+
+    /// `type` as it is stored. `size` counts the data alone.
+    bool readChunkTypeAndSize(std::uint32_t& type, std::uint32_t& size);
+
+private:
+    void catchUp();
+
+    std::istream& stream_;
+    std::uint64_t streamPosition_;
+    std::uint64_t position_;
+    std::uint64_t total_;
+};
+
+} // namespace ZULMetaData::detail

@@ -1,0 +1,163 @@
+#include "ZULMetaData/ZULMMetaDataParser.h"
+
+#include "ZULMetaData/ContainerScan.h"
+#include "ZULMetaData/PositionedInput.h"
+
+#include <algorithm>
+#include <fstream>
+#include <iostream>
+#include <utility>
+
+namespace ZULMetaData {
+
+namespace {
+
+/// From the last dot of the whole path on, in lower case.
+std::string extensionOf(const std::string& path) {
+    const std::size_t dot = path.rfind('.');
+    std::string extension = dot == std::string::npos ? std::string() : path.substr(dot);
+    const auto toLower = [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c; };
+    std::ranges::transform(extension, extension.begin(), toLower);
+    return extension;
+}
+
+class MetaDataFileParser final : public MetaDataParser {
+public:
+    explicit MetaDataFileParser(const std::string& path) : path_(path), extension_(extensionOf(path)) {
+        fileOpen(file_, path_.c_str(), std::ios_base::in | std::ios_base::binary);
+    }
+
+    bool isOpen() const { return file_.is_open(); }
+
+    StreamType getStreamType() const override {
+        if (extension_ == ".avi" || extension_ == ".wav")
+            return Riff;
+        if (extension_ == ".zcap" || extension_ == ".mp4" || extension_ == ".mov")
+            return QuickTime;
+        return extension_ == ".dat" ? RawStream : Unknown;
+    }
+
+    std::istream& getStream() override { return file_; }
+    void close() override { file_.close(); }
+
+private:
+    std::string path_;
+    std::string extension_;
+    std::ifstream file_;
+};
+
+class MetaDataStreamParser final : public MetaDataParser {
+public:
+    MetaDataStreamParser(std::istream& stream, StreamType type) : stream_(stream), type_(type) {}
+
+    StreamType getStreamType() const override { return type_; }
+    std::istream& getStream() override { return stream_; }
+    void close() override {}
+
+private:
+    std::istream& stream_;
+    StreamType type_;
+};
+
+} // namespace
+
+std::unique_ptr<MetaDataParser> MetaDataParser::create(const std::string& path) {
+    auto parser = std::make_unique<MetaDataFileParser>(path);
+    if (!parser->isOpen()) {
+        std::cerr << "Can't parse metadata. Unable to open file: " << path << std::endl;
+        return nullptr;
+    }
+    return parser->cacheFileStreamInfo() ? std::move(parser) : nullptr;
+}
+
+std::unique_ptr<MetaDataParser> MetaDataParser::create(std::istream& stream, StreamType type) {
+    if (!stream.good()) {
+        std::cerr << "Can't parse metadata. Stream is not good." << std::endl;
+        return nullptr;
+    }
+    auto parser = std::make_unique<MetaDataStreamParser>(stream, type);
+    return parser->cacheFileStreamInfo() ? std::move(parser) : nullptr;
+}
+
+std::vector<uuid> MetaDataParser::getAvailableMetaDataUUIDs() const {
+    std::vector<uuid> types;
+    types.reserve(cache_.size());
+    for (const auto& [type, range] : cache_)
+        types.push_back(type);
+    return types;
+}
+
+MetaDataParser::CachedFileData MetaDataParser::fileDataForUUID(const uuid& type) const {
+    const auto found = cache_.find(type);
+    return found == cache_.end() ? CachedFileData{0, 0} : found->second;
+}
+
+void MetaDataParser::loadAllData(std::map<uuid, std::string>& out) {
+    std::istream& stream = getStream();
+    for (const auto& [type, range] : cache_) {
+        if (!stream.good())
+            stream.clear();
+        const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+        stream.seekg(static_cast<std::streamoff>(range.offset));
+        if (!stream.good())
+            continue;
+        std::string& bytes = out[type];
+        bytes.clear();
+        if (stream.peek() == std::istream::traits_type::eof())
+            continue; // nothing there, or a directory, whose size means nothing
+        bytes.resize(std::min(range.length, total - std::min(range.offset, total)));
+        stream.read(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+        bytes.resize(static_cast<std::size_t>(stream.gcount()));
+    }
+}
+
+bool MetaDataParser::cacheFileStreamInfo() {
+    const StreamType type = getStreamType();
+    if (type == Unknown)
+        return false;
+    std::istream& stream = getStream();
+    cache_.clear();
+    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+    stream.seekg(0);
+    if (type == RawStream)
+        detail::scanRawStream(stream, total, cache_);
+    else if (type == QuickTime)
+        detail::scanAtoms(stream, total, cache_);
+    else
+        detail::scanChunks(stream, total, cache_);
+    return true;
+}
+
+namespace ParserUtil {
+
+namespace {
+
+detail::PositionedInput inputAt(std::istream& stream, std::uint64_t total) {
+    return {stream, static_cast<std::uint64_t>(toInt64(stream.tellg())), total};
+}
+
+} // namespace
+
+std::int64_t calcFileSize(std::istream& stream) {
+    const std::streampos position = stream.tellg();
+    stream.seekg(0, std::ios_base::end);
+    const std::int64_t size = toInt64(stream.tellg());
+    stream.seekg(position);
+    return size;
+}
+
+bool enoughBytesLeft(std::istream& stream, std::uint64_t total, std::uint64_t needed) {
+    return inputAt(stream, total).enoughBytesLeft(needed);
+}
+
+bool readAtomSizeAndType(std::istream& stream, std::uint64_t total, std::uint64_t& size, std::uint32_t& type) {
+    return inputAt(stream, total).readAtomSizeAndType(size, type);
+}
+
+bool readChunkTypeAndSize(std::istream& stream, std::uint64_t total, std::uint32_t& type, std::uint32_t& size) {
+    return inputAt(stream, total).readChunkTypeAndSize(type, size);
+}
+
+} // namespace ParserUtil
+
+} // namespace ZULMetaData

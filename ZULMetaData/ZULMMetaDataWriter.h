@@ -1,0 +1,152 @@
+#pragma once
+
+// Writes one metadata stream file: a header, then entries of a time and a value.
+//
+//     MetaDataWriter<Point, int, int> writer;
+//     writer.init("CursorLocation.dat", s_cursorLocationUUID, 1);
+//     writer.write(0.25, Point(10, -4), true);
+//     writer.close();
+
+#include "SharedDependencies/EndianFile.h"
+#include "ZULMetaData/CursorImageWriter.h"
+#include "ZULMetaData/ZULMMetaDataCommon.h"
+#include "ZULMetaData/ZULMMetaDataUUIDs.h"
+
+#include <array>
+#include <cstdint>
+#include <cstring>
+#include <fstream>
+#include <list>
+#include <ostream>
+#include <string>
+
+namespace ZULMetaData {
+
+/// Bytes of an entry that holds a `T`; 0 where entries vary in size.
+template <StreamValue T>
+std::uint32_t metaDataFixedEntrySize();
+
+/// Appends one entry to `stream`, in the layout of the stream `version` (only cursor images have more than one).
+/// Failures show in the state of `stream` alone.
+template <StreamValue T>
+void metaDataWrite(double time, const T& value, std::ostream& stream, int version);
+
+/// Nothing here reports an error: where the file cannot be opened or written, the stream that `getStream` gives
+/// is in a failed state and entries are dropped. `A` and `B` play no part in the format.
+template <StreamValue T, class A, class B>
+class MetaDataWriter {
+public:
+    MetaDataWriter() = default;
+    MetaDataWriter(const MetaDataWriter&) = delete;
+    MetaDataWriter& operator=(const MetaDataWriter&) = delete;
+
+    /// Creates or empties the file at `path` and writes the header.
+    void init(const std::string& path, const uuid& typeUuid, int version);
+
+    /// Written and flushed by `init` already.
+    void writeHeader(const uuid& typeUuid, int version);
+
+    /// `time` is in seconds on the recording's time line. Without `flush` the entry may stay in the file buffer.
+    void write(double time, const T& value, bool flush);
+
+    /// May be called more than once.
+    void close();
+
+    virtual std::ofstream& getStream() { return stream; }
+
+    /// Closes. An exception from closing (the stream's exception mask is the caller's) ends the process.
+    ~MetaDataWriter() { close(); }
+
+private:
+    std::string path;
+    std::ofstream stream;
+    std::int32_t version = 0;
+};
+
+// ---------------------------------------------------------------------------------------------------------------
+
+template <StreamValue T>
+std::uint32_t metaDataFixedEntrySize() {
+    if constexpr (FixedSizeValue<T>)
+        return sizeof(double) + sizeof(T);
+    else
+        return 0;
+}
+
+namespace detail {
+
+/// Sizes are 32 bits wide on disk; longer texts wrap around.
+inline std::uint32_t stringEntrySize(const std::string& text) {
+    return static_cast<std::uint32_t>(text.size() + sizeof(double));
+}
+
+inline void writeStringEntry(double time, const std::string& text, std::ostream& stream) {
+    std::array<char, sizeof(std::uint32_t) + sizeof(double)> prefix;
+    const std::uint32_t size = stringEntrySize(text);
+    std::memcpy(prefix.data(), &size, sizeof size);
+    std::memcpy(prefix.data() + sizeof size, &time, sizeof time);
+    stream.write(prefix.data(), prefix.size());
+    stream.write(text.data(), static_cast<std::streamsize>(text.size()));
+}
+
+/// The list has no time of its own: every element repeats it.
+inline void writeStringListEntry(double time, const std::list<std::string>& texts, std::ostream& stream) {
+    std::array<std::uint32_t, 2> totalAndCount{sizeof(std::uint32_t), static_cast<std::uint32_t>(texts.size())};
+    for (const std::string& text : texts)
+        totalAndCount[0] += static_cast<std::uint32_t>(sizeof(std::uint32_t)) + stringEntrySize(text);
+    stream.write(reinterpret_cast<const char*>(totalAndCount.data()), sizeof totalAndCount);
+    for (const std::string& text : texts)
+        writeStringEntry(time, text, stream);
+}
+
+template <FixedSizeValue T>
+void writeFixedEntry(double time, const T& value, std::ostream& stream) {
+    std::array<char, sizeof(double) + sizeof(T)> entry;
+    std::memcpy(entry.data(), &time, sizeof time);
+    std::memcpy(entry.data() + sizeof time, &value, sizeof value);
+    stream.write(entry.data(), entry.size());
+}
+
+} // namespace detail
+
+template <StreamValue T>
+void metaDataWrite(double time, const T& value, std::ostream& stream, [[maybe_unused]] int version) {
+    if constexpr (FixedSizeValue<T>)
+        detail::writeFixedEntry(time, value, stream);
+    else if constexpr (std::same_as<T, std::string>)
+        detail::writeStringEntry(time, value, stream);
+    else if constexpr (std::same_as<T, std::list<std::string>>)
+        detail::writeStringListEntry(time, value, stream);
+    else
+        detail::writeCursorImageEntry(time, value, stream, version);
+}
+
+template <StreamValue T, class A, class B>
+void MetaDataWriter<T, A, B>::init(const std::string& filePath, const uuid& typeUuid, int streamVersion) {
+    version = streamVersion;
+    path = filePath;
+    fileOpen(stream, path.c_str(), std::ios_base::binary | std::ios_base::out | std::ios_base::trunc);
+    writeHeader(typeUuid, version);
+}
+
+template <StreamValue T, class A, class B>
+void MetaDataWriter<T, A, B>::writeHeader(const uuid& typeUuid, int streamVersion) {
+    const MetaDataHeader header{typeUuid, streamVersion, metaDataFixedEntrySize<T>()};
+    stream.write(reinterpret_cast<const char*>(&header), sizeof header);
+    stream.flush();
+}
+
+template <StreamValue T, class A, class B>
+void MetaDataWriter<T, A, B>::write(double time, const T& value, bool flush) {
+    metaDataWrite<T>(time, value, stream, version);
+    if (flush)
+        stream.flush();
+}
+
+template <StreamValue T, class A, class B>
+void MetaDataWriter<T, A, B>::close() {
+    if (stream.is_open())
+        stream.close();
+}
+
+} // namespace ZULMetaData

@@ -1,0 +1,96 @@
+#pragma once
+
+// What an application hands to the writers: times, points and rectangles in its own terms. The platform's own
+// records convert to these by their shape, so that none of its headers is needed here.
+
+#include "ZULMetaData/ZULMMetaDataCommon.h"
+
+#include <cmath>
+#include <concepts>
+#include <cstdint>
+#include <limits>
+
+namespace ZULMetaData {
+
+template <class R>
+concept PlatformPoint = requires(const R& r) {
+    { r.x } -> std::convertible_to<double>;
+    { r.y } -> std::convertible_to<double>;
+};
+
+template <class R>
+concept PlatformRect = requires(const R& r) {
+    { r.origin } -> PlatformPoint;
+    { r.size.width } -> std::convertible_to<double>;
+    { r.size.height } -> std::convertible_to<double>;
+};
+
+template <class R>
+concept PlatformTime = requires(const R& r) {
+    { r.value } -> std::convertible_to<std::int64_t>;
+    { r.timescale } -> std::convertible_to<std::int32_t>;
+    { r.flags } -> std::convertible_to<std::uint32_t>;
+    { r.epoch } -> std::convertible_to<std::int64_t>;
+};
+
+struct MediaTime {
+    std::int64_t value = 0;
+    std::int32_t timescale = 0; ///< units of `value` in a second
+    std::uint32_t flags = 0;
+    std::int64_t epoch = 0;
+
+    constexpr MediaTime() = default;
+    constexpr MediaTime(std::int64_t timeValue, std::int32_t scale, std::uint32_t timeFlags = 0,
+                        std::int64_t timeEpoch = 0)
+        : value(timeValue), timescale(scale), flags(timeFlags), epoch(timeEpoch) {}
+    template <PlatformTime T>
+    constexpr MediaTime(const T& time) : MediaTime(time.value, time.timescale, time.flags, time.epoch) {}
+
+    /// Flags and epoch do not count. A timescale of 0 gives an infinite time or not a number.
+    double seconds() const { return static_cast<double>(value) / static_cast<double>(timescale); }
+};
+
+struct ScreenPoint {
+    double x = 0;
+    double y = 0;
+
+    constexpr ScreenPoint() = default;
+    constexpr ScreenPoint(double xValue, double yValue) : x(xValue), y(yValue) {}
+    template <PlatformPoint P>
+    constexpr ScreenPoint(const P& point) : ScreenPoint(point.x, point.y) {}
+};
+
+struct ScreenRect {
+    double x = 0;
+    double y = 0;
+    double width = 0;
+    double height = 0;
+
+    constexpr ScreenRect() = default;
+    constexpr ScreenRect(double xValue, double yValue, double widthValue, double heightValue)
+        : x(xValue), y(yValue), width(widthValue), height(heightValue) {}
+    template <PlatformRect R>
+    constexpr ScreenRect(const R& rect) : ScreenRect(rect.origin.x, rect.origin.y, rect.size.width, rect.size.height) {}
+};
+
+/// Toward zero; saturates outside the 32-bit range, and not-a-number becomes 0.
+inline std::int32_t truncated(double coordinate) {
+    using Limits = std::numeric_limits<std::int32_t>;
+    if (std::isnan(coordinate))
+        return 0;
+    if (coordinate <= Limits::min())
+        return Limits::min();
+    if (coordinate >= Limits::max())
+        return Limits::max();
+    return static_cast<std::int32_t>(coordinate);
+}
+
+inline Point truncated(const ScreenPoint& point) {
+    return {truncated(point.x), truncated(point.y)};
+}
+
+inline Rect truncated(const ScreenRect& rect) {
+    return {truncated(rect.x), truncated(rect.y), truncated(rect.width), truncated(rect.height)};
+}
+
+} // namespace ZULMetaData

@@ -1,0 +1,95 @@
+#include "ZULMetaDataBridge/Source/EntryTexts.h"
+
+#include <algorithm>
+#include <cstddef>
+#include <cstdint>
+#include <stdexcept>
+
+namespace ZULMetaData {
+
+namespace {
+
+bool isContinuation(unsigned char byte) {
+    return (byte & 0xc0) == 0x80;
+}
+
+/// What a first byte announces: the length of its character and the range of its second byte, which keeps out
+/// overlong forms, surrogates and everything above U+10FFFF.
+struct Sequence {
+    std::size_t length;
+    unsigned char secondFrom = 0x80;
+    unsigned char secondTo = 0xbf;
+};
+
+Sequence sequenceOf(unsigned char first) {
+    if (first < 0x80)
+        return {1};
+    if (first >= 0xc2 && first <= 0xdf)
+        return {2};
+    if (first == 0xe0)
+        return {3, 0xa0, 0xbf};
+    if (first == 0xed)
+        return {3, 0x80, 0x9f};
+    if (first >= 0xe1 && first <= 0xef)
+        return {3};
+    if (first == 0xf0)
+        return {4, 0x90, 0xbf};
+    if (first == 0xf4)
+        return {4, 0x80, 0x8f};
+    if (first >= 0xf1 && first <= 0xf3)
+        return {4};
+    return {0};
+}
+
+/// Bytes of the valid character that `bytes` begins with; 0 where there is none.
+std::size_t validCharacterLength(std::string_view bytes) {
+    const auto byteAt = [bytes](std::size_t index) { return static_cast<unsigned char>(bytes[index]); };
+    const Sequence sequence = sequenceOf(byteAt(0));
+    if (sequence.length > bytes.size())
+        return 0;
+    if (sequence.length > 1 && (byteAt(1) < sequence.secondFrom || byteAt(1) > sequence.secondTo))
+        return 0;
+    for (std::size_t index = 2; index < sequence.length; ++index)
+        if (!isContinuation(byteAt(index)))
+            return 0;
+    return sequence.length;
+}
+
+std::string_view upToZeroByte(std::string_view bytes) {
+    return bytes.substr(0, bytes.find('\0'));
+}
+
+} // namespace
+
+bool isUTF8(std::string_view bytes) {
+    while (!bytes.empty()) {
+        const std::size_t length = validCharacterLength(bytes);
+        if (length == 0)
+            return false;
+        bytes.remove_prefix(length);
+    }
+    return true;
+}
+
+std::string textFromUTF8(const std::string& bytes) {
+    const std::string_view text = upToZeroByte(bytes);
+    if (!isUTF8(text))
+        throw std::invalid_argument("text is not valid UTF-8");
+    return std::string(text);
+}
+
+std::string textFromLatin1(const std::string& bytes) {
+    std::string text;
+    for (const char c : upToZeroByte(bytes)) {
+        const auto code = static_cast<unsigned char>(c);
+        if (code < 0x80) {
+            text += c;
+        } else {
+            text += static_cast<char>(0xc0 | code >> 6);
+            text += static_cast<char>(0x80 | (code & 0x3f));
+        }
+    }
+    return text;
+}
+
+} // namespace ZULMetaData

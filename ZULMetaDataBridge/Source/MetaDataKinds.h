@@ -1,0 +1,206 @@
+#pragma once
+
+// What is peculiar to each kind of metadata that the application records and reads: the value its entries hold,
+// the identifier and version of its stream, and the keys under which its entries are read back.
+
+#include "ZULMetaData/ZULMMetaDataCommon.h"
+#include "ZULMetaData/ZULMMetaDataUUIDs.h"
+#include "ZULMetaDataBridge/Source/EntryDictionary.h"
+#include "ZULMetaDataBridge/Source/EntryTexts.h"
+#include "ZULMetaDataBridge/Source/HumanReadableActions.h"
+
+#include <cstdint>
+#include <functional>
+#include <iterator>
+#include <list>
+#include <stdexcept>
+#include <string>
+#include <tuple>
+#include <type_traits>
+
+namespace ZULMetaData {
+
+/// One key of an entry, and how its value is taken from what the stream holds.
+template <class Projection>
+struct Field {
+    const char* key;
+    Projection valueOf;
+
+    constexpr Field(const char* fieldKey, Projection projection) : key(fieldKey), valueOf(projection) {}
+};
+
+inline constexpr std::tuple s_pointFields{Field{"x", &Point::x}, Field{"y", &Point::y}};
+
+inline constexpr std::tuple s_rectFields{Field{"x", &Rect::x}, Field{"y", &Rect::y}, Field{"width", &Rect::width},
+                                         Field{"height", &Rect::height}};
+
+struct TopmostWindowKind {
+    using Value = Rect;
+    static constexpr uuid type = s_topmostWindowUUID;
+    static constexpr int version = 1;
+    static constexpr auto fields = s_rectFields;
+};
+
+struct HoverRectKind {
+    using Value = Rect;
+    static constexpr uuid type = s_hoverRectUUID;
+    static constexpr int version = 1;
+    static constexpr auto fields = s_rectFields;
+};
+
+struct RecordingRegionKind {
+    using Value = Rect;
+    static constexpr uuid type = s_recordingRegionUUID;
+    static constexpr int version = 1;
+    static constexpr auto fields = s_rectFields;
+};
+
+struct ScrollActionKind {
+    using Value = Point;
+    static constexpr uuid type = s_scrollActionUUID;
+    static constexpr int version = 1;
+    static constexpr auto fields = s_pointFields;
+};
+
+struct CursorLocationKind {
+    using Value = Point;
+    static constexpr uuid type = s_cursorLocationUUID;
+    static constexpr int version = 1;
+    static constexpr auto fields = s_pointFields;
+};
+
+struct CPUUsageKind {
+    using Value = float;
+    static constexpr uuid type = s_cpuUsageUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{Field{"cpuUsage", std::identity{}}};
+};
+
+struct CursorOpacityKind {
+    using Value = double;
+    static constexpr uuid type = s_cursorOpacityUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{Field{"opacity", std::identity{}}};
+};
+
+struct ScaleFactorKind {
+    using Value = std::int32_t;
+    static constexpr uuid type = s_recordingScaleFactorUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{Field{"scaleFactor", std::identity{}}};
+};
+
+struct SlideInfoTitleKind {
+    using Value = std::string;
+    static constexpr uuid type = s_slideTitlesUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{Field{"title", textFromUTF8}};
+};
+
+struct SlideInfoTextKind {
+    using Value = std::string;
+    static constexpr uuid type = s_slideTextUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{Field{"text", textFromUTF8}};
+};
+
+struct SlideInfoCommentKind {
+    using Value = std::string;
+    static constexpr uuid type = s_slideCommentUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{Field{"comment", textFromUTF8}};
+};
+
+struct TopmostWindowTitleKind {
+    using Value = std::string;
+    static constexpr uuid type = s_topmostWindowTitleUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{Field{"title", textFromUTF8}};
+};
+
+struct TopmostAppNameKind {
+    using Value = std::string;
+    static constexpr uuid type = s_topmostAppNameUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{Field{"name", textFromUTF8}};
+};
+
+/// The image that an entry carries, or the text "nil" where it has none or one that cannot be decoded.
+EntryValue entryImage(const CursorImage& cursor);
+
+struct CursorImageKind {
+    using Value = CursorImage;
+    static constexpr uuid type = s_cursorImageUUID;
+    static constexpr int version = 2;
+    static constexpr std::tuple fields{Field{"image", entryImage}, Field{"id", &CursorImage::uniqueId},
+                                       Field{"hotspotOffsetX", &CursorImage::hotspotOffsetX},
+                                       Field{"hotspotOffsetY", &CursorImage::hotspotOffsetY}};
+};
+
+struct CursorActionKind {
+    using Value = std::int32_t;
+    static constexpr uuid type = s_cursorActionUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{Field{"action", HumanReadableActions::CursorActionToString},
+                                       Field{"rawActionValue", std::identity{}}};
+};
+
+inline std::string keyText(const KeyStroke& key) {
+    return HumanReadableActions::KeyboardActionCodeToString(static_cast<std::int32_t>(key.characterCode));
+}
+
+inline std::string keyModifiersText(const KeyStroke& key) {
+    return HumanReadableActions::KeyboardModifiersToString(static_cast<std::int32_t>(key.eventFlagsCode));
+}
+
+struct KeyboardActionKind {
+    using Value = KeyStroke;
+    static constexpr uuid type = s_keyboardActionUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{
+        Field{"characterCode", &KeyStroke::characterCode}, Field{"characterString", keyText},
+        Field{"eventFlagsCode", &KeyStroke::eventFlagsCode}, Field{"eventFlagsString", keyModifiersText}};
+};
+
+/// Throws `std::out_of_range` where an entry holds too few texts.
+template <std::size_t Position>
+std::string systemText(const std::list<std::string>& texts) {
+    if (texts.size() <= Position)
+        throw std::out_of_range("system data entry with fewer than four texts");
+    return textFromLatin1(*std::next(texts.begin(), Position));
+}
+
+struct SystemDataKind {
+    using Value = std::list<std::string>;
+    static constexpr uuid type = s_systemDataUUID;
+    static constexpr int version = 1;
+    static constexpr std::tuple fields{Field{"processorCount", systemText<0>},
+                                       Field{"activeProcessorCount", systemText<1>}, Field{"osVersion", systemText<2>},
+                                       Field{"ram", systemText<3>}};
+};
+
+template <class... Kinds>
+struct KindList {
+    static constexpr std::size_t size = sizeof...(Kinds);
+
+    /// Calls `visit.template operator()<Kind>()` for every kind.
+    template <class Visit>
+    static constexpr void forEach(Visit&& visit) {
+        (visit.template operator()<Kinds>(), ...);
+    }
+
+    /// The same for the kind of `type` alone. False where it is not in the list.
+    template <class Visit>
+    static constexpr bool visit(const uuid& type, Visit&& visitor) {
+        return ((Kinds::type == type ? (visitor.template operator()<Kinds>(), true) : false) || ...);
+    }
+};
+
+/// Every kind that has a writer and a parser, in the order of the registry.
+using RecordedKinds =
+    KindList<CursorActionKind, CursorImageKind, CursorLocationKind, CursorOpacityKind, KeyboardActionKind,
+             RecordingRegionKind, TopmostWindowKind, SlideInfoTitleKind, SlideInfoTextKind, SlideInfoCommentKind,
+             ScaleFactorKind, SystemDataKind, ScrollActionKind, TopmostAppNameKind, TopmostWindowTitleKind,
+             CPUUsageKind, HoverRectKind>;
+
+} // namespace ZULMetaData

@@ -1,0 +1,23 @@
+#pragma once
+
+#include "ZULMetaData/ZULMMetaDataReader.h"
+
+#include <vector>
+
+namespace ZULMetaData {
+
+/// Collects every entry of a stream, in the order in which they come.
+template <StreamValue T>
+class MetaDataObserver : public DataStreamObserver<T> {
+public:
+    std::vector<T> values;
+    std::vector<double> times; ///< in seconds, one for each value
+
+    bool dataRead(double time, const T& value) override {
+        values.push_back(value);
+        times.push_back(time);
+        return true;
+    }
+};
+
+} // namespace ZULMetaData

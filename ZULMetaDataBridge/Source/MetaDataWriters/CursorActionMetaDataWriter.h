@@ -1,0 +1,17 @@
+#pragma once
+
+#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+
+#include <cstdint>
+
+namespace ZULMetaData {
+
+/// Buttons pressed and released, with modifiers, as the bits that `HumanReadableActions` names.
+class CursorActionMetaDataWriter final : public ContinuousMetaDataWriter<CursorActionKind> {
+public:
+    using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
+
+    void write(std::int32_t action, const MediaTime& time) { append(action, time); }
+};
+
+} // namespace ZULMetaData

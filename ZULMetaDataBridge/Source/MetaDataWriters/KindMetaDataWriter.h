@@ -1,0 +1,164 @@
+#pragma once
+
+// The mechanism of the writer family: how a stream writer is created and released, and the three ways of writing.
+// A class of the family adds what is peculiar to its kind.
+
+#include "ZULMetaData/ZULMMetaDataWriter.h"
+#include "ZULMetaDataBridge/Source/ApplicationValues.h"
+#include "ZULMetaDataBridge/Source/MetaDataKinds.h"
+#include "ZULMetaDataBridge/Source/MetaDataWriters/BaseMetaDataWriter.h"
+#include "ZULMetaDataBridge/Source/MetaDataWriters/KeptReachable.h"
+
+#include <cstdint>
+#include <memory>
+#include <utility>
+
+namespace ZULMetaData {
+
+/// What becomes of the stream writer when the writer that made it is destroyed.
+enum class StreamWriterRelease { WithWriter, Never };
+
+template <class Kind, StreamWriterRelease Release = StreamWriterRelease::WithWriter>
+class KindMetaDataWriter : public BaseMetaDataWriter {
+public:
+    using StreamWriter = MetaDataWriter<typename Kind::Value, int, int>;
+
+    KindMetaDataWriter() = default;
+    ~KindMetaDataWriter() override { release(); }
+
+    /// Creates the file and writes its header. Look at the state of `metaDataWriter()->getStream()` to learn
+    /// whether that, and what was written since, has worked.
+    void setup() override {
+        release();
+        metaDataWriter_ = new StreamWriter;
+        if (Release == StreamWriterRelease::Never)
+            keepReachable(metaDataWriter_);
+        metaDataWriter_->init(utf8Path(metaDataFile()), Kind::type, Kind::version);
+    }
+
+    /// Null before the first `setup`.
+    StreamWriter* metaDataWriter() const { return metaDataWriter_; }
+
+    /// Only stores the pointer: what was there before is the caller's now, and `writer` is released with this.
+    void setMetaDataWriter(StreamWriter* writer) { metaDataWriter_ = writer; }
+
+protected:
+    void append(const typename Kind::Value& value, double seconds, bool flush) {
+        if (metaDataWriter_)
+            metaDataWriter_->write(seconds, value, flush);
+    }
+
+    void closeStream() {
+        if (metaDataWriter_)
+            metaDataWriter_->close();
+    }
+
+private:
+    void release() {
+        StreamWriter* writer = std::exchange(metaDataWriter_, nullptr);
+        if (Release == StreamWriterRelease::WithWriter)
+            std::default_delete<StreamWriter>{}(writer);
+    }
+
+    StreamWriter* metaDataWriter_ = nullptr;
+};
+
+/// Any number of entries, each flushed unless `setFlushEveryWrite(false)` leaves that to the file buffer.
+template <class Kind>
+class ContinuousMetaDataWriter : public KindMetaDataWriter<Kind> {
+public:
+    ContinuousMetaDataWriter() = default;
+    explicit ContinuousMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); }
+
+    void setup() override {
+        flushEveryWrite_ = true;
+        KindMetaDataWriter<Kind>::setup();
+    }
+
+    void finish() { this->closeStream(); }
+
+    bool flushEveryWrite() const { return flushEveryWrite_; }
+    void setFlushEveryWrite(bool flush) { flushEveryWrite_ = flush; }
+
+protected:
+    void append(const typename Kind::Value& value, const MediaTime& time) {
+        KindMetaDataWriter<Kind>::append(value, time.seconds(), flushEveryWrite_);
+    }
+
+private:
+    bool flushEveryWrite_ = false;
+};
+
+/// Texts, stored as they are.
+template <class Kind>
+class TextMetaDataWriter : public ContinuousMetaDataWriter<Kind> {
+public:
+    using ContinuousMetaDataWriter<Kind>::ContinuousMetaDataWriter;
+
+    /// `utf8` ends with a zero byte. Null is not written.
+    void write(const char* utf8, const MediaTime& time) {
+        if (utf8)
+            this->append(utf8, time);
+    }
+};
+
+/// Entries between two flushes of the kinds that come many times a second.
+inline constexpr std::uint32_t s_flushInterval = 15;
+
+/// Any number of entries, of which the first and every 15th after it are flushed.
+template <class Kind>
+class CountedMetaDataWriter : public KindMetaDataWriter<Kind> {
+public:
+    CountedMetaDataWriter() = default;
+    explicit CountedMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); }
+
+    void finish() { this->closeStream(); }
+
+    /// Asked before an entry is counted. Starts the count anew where it says yes.
+    bool shouldFlush() {
+        if (written_ % s_flushInterval != 0)
+            return false;
+        written_ = 0;
+        return true;
+    }
+
+protected:
+    void append(const typename Kind::Value& value, const MediaTime& time) {
+        KindMetaDataWriter<Kind>::append(value, time.seconds(), shouldFlush());
+        ++written_;
+    }
+
+    std::uint32_t written() const { return written_; }
+    void setWritten(std::uint32_t count) { written_ = count; }
+
+private:
+    std::uint32_t written_ = 0;
+};
+
+/// One entry at time 0, after which the file is closed and every further one is ignored.
+template <class Kind, StreamWriterRelease Release>
+class OneShotMetaDataWriter : public KindMetaDataWriter<Kind, Release> {
+public:
+    OneShotMetaDataWriter() = default;
+    explicit OneShotMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); }
+
+    bool hasWritten() const { return hasWritten_; }
+    void setHasWritten(bool written) { hasWritten_ = written; }
+
+protected:
+    template <class MakeValue>
+    void writeOnce(MakeValue makeValue) {
+        if (hasWritten_)
+            return;
+        const typename Kind::Value value = makeValue();
+        if (this->metaDataWriter())
+            metaDataWrite(0.0, value, this->metaDataWriter()->getStream(), Kind::version);
+        this->closeStream();
+        hasWritten_ = true;
+    }
+
+private:
+    bool hasWritten_ = false;
+};
+
+} // namespace ZULMetaData

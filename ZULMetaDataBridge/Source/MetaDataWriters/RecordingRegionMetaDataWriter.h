@@ -1,0 +1,18 @@
+#pragma once
+
+#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+
+namespace ZULMetaData {
+
+/// The region of the display that is recorded, in pixels.
+class RecordingRegionMetaDataWriter final
+    : public OneShotMetaDataWriter<RecordingRegionKind, StreamWriterRelease::WithWriter> {
+public:
+    using OneShotMetaDataWriter::OneShotMetaDataWriter;
+
+    void writeAndFinalize(const ScreenRect& region) {
+        writeOnce([&] { return truncated(region); });
+    }
+};
+
+} // namespace ZULMetaData

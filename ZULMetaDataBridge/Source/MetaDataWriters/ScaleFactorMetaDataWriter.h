@@ -1,0 +1,19 @@
+#pragma once
+
+#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+
+#include <cstdint>
+
+namespace ZULMetaData {
+
+/// The scale factor of the recorded display. Its stream writer stays when it goes.
+class ScaleFactorMetaDataWriter final : public OneShotMetaDataWriter<ScaleFactorKind, StreamWriterRelease::Never> {
+public:
+    using OneShotMetaDataWriter::OneShotMetaDataWriter;
+
+    void writeAndFinalize(std::int32_t scaleFactor) {
+        writeOnce([&] { return scaleFactor; });
+    }
+};
+
+} // namespace ZULMetaData

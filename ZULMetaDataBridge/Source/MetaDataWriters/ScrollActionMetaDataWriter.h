@@ -1,0 +1,15 @@
+#pragma once
+
+#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+
+namespace ZULMetaData {
+
+/// How far was scrolled, in pixels.
+class ScrollActionMetaDataWriter final : public ContinuousMetaDataWriter<ScrollActionKind> {
+public:
+    using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
+
+    void write(const ScreenPoint& delta, const MediaTime& time) { append(truncated(delta), time); }
+};
+
+} // namespace ZULMetaData

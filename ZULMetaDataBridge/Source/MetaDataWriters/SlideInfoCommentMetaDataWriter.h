@@ -1,0 +1,13 @@
+#pragma once
+
+#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+
+namespace ZULMetaData {
+
+/// The presenter's comment on the slide that is shown.
+class SlideInfoCommentMetaDataWriter final : public TextMetaDataWriter<SlideInfoCommentKind> {
+public:
+    using TextMetaDataWriter::TextMetaDataWriter;
+};
+
+} // namespace ZULMetaData

@@ -1,0 +1,13 @@
+#pragma once
+
+#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+
+namespace ZULMetaData {
+
+/// The text of the slide that is shown.
+class SlideInfoTextMetaDataWriter final : public TextMetaDataWriter<SlideInfoTextKind> {
+public:
+    using TextMetaDataWriter::TextMetaDataWriter;
+};
+
+} // namespace ZULMetaData

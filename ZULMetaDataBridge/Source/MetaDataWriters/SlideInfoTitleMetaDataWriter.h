@@ -1,0 +1,13 @@
+#pragma once
+
+#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+
+namespace ZULMetaData {
+
+/// The title of the slide that is shown.
+class SlideInfoTitleMetaDataWriter final : public TextMetaDataWriter<SlideInfoTitleKind> {
+public:
+    using TextMetaDataWriter::TextMetaDataWriter;
+};
+
+} // namespace ZULMetaData

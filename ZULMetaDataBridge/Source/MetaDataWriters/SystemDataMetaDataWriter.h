@@ -1,0 +1,24 @@
+#pragma once
+
+#include "Platform/ProcessInfo.h"
+#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+
+#include <list>
+#include <string>
+
+namespace ZULMetaData {
+
+/// The machine that records: processors, operating system and memory. Its stream writer stays when it goes.
+class SystemDataMetaDataWriter final : public OneShotMetaDataWriter<SystemDataKind, StreamWriterRelease::Never> {
+public:
+    using OneShotMetaDataWriter::OneShotMetaDataWriter;
+
+    void write() {
+        writeOnce([] { return systemTexts(ProcessInfo::current()); });
+    }
+
+    /// The texts of an entry, which a reader finds by their position.
+    static std::list<std::string> systemTexts(const ProcessInfo& machine);
+};
+
+} // namespace ZULMetaData

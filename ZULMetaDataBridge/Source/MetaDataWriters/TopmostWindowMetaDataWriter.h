@@ -1,0 +1,15 @@
+#pragma once
+
+#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+
+namespace ZULMetaData {
+
+/// Where the window on top was, in pixels.
+class TopmostWindowMetaDataWriter final : public ContinuousMetaDataWriter<TopmostWindowKind> {
+public:
+    using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
+
+    void write(const ScreenRect& window, const MediaTime& time) { append(truncated(window), time); }
+};
+
+} // namespace ZULMetaData

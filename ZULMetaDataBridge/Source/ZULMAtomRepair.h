@@ -1,0 +1,13 @@
+#pragma once
+
+#include "Platform/FileLocation.h"
+
+namespace ZULMetaData {
+
+class ZULMAtomRepair {
+public:
+    /// Gives the last atom of a movie that was cut short its real size; see `Util::finalizeAtomsInFile`.
+    static bool finalizeAtomsInFile(const FileLocation& file);
+};
+
+} // namespace ZULMetaData

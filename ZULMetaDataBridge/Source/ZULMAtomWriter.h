@@ -1,0 +1,16 @@
+#pragma once
+
+#include "Platform/FileLocation.h"
+
+#include <vector>
+
+namespace ZULMetaData {
+
+class ZULMAtomWriter {
+public:
+    /// Repairs the movie's last atom and appends the stream files behind it as one atom, in this order. Failures
+    /// to open a file show on standard output alone; throws as `MP4MetaData::appendMetaDataFiles` does.
+    void writeMetaDataFiles(const std::vector<FileLocation>& files, const FileLocation& toFile) const;
+};
+
+} // namespace ZULMetaData
