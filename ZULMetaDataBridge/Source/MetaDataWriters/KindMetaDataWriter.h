@@ -10,7 +10,7 @@
 #include "ZULMetaDataBridge/Source/MetaDataWriters/KeptReachable.h"
 
 #include <cstdint>
-#include <memory>
+#include <new>
 #include <utility>
 
 namespace ZULMetaData {
@@ -56,8 +56,10 @@ protected:
 private:
     void release() {
         StreamWriter* writer = std::exchange(metaDataWriter_, nullptr);
-        if (Release == StreamWriterRelease::WithWriter)
-            std::default_delete<StreamWriter>{}(writer);
+        if (!writer || Release == StreamWriterRelease::Never)
+            return;
+        writer->StreamWriter::~StreamWriter(); // of exactly this type: a stream writer's destructor is not virtual
+        ::operator delete(writer);
     }
 
     StreamWriter* metaDataWriter_ = nullptr;
