@@ -2,8 +2,10 @@
 
 // Everything of the stream core: values, streams, containers.
 
+#include "ZULMetaData/ContainerLayout.h"
 #include "ZULMetaData/CursorImageSchema.h"
 #include "ZULMetaData/CursorImageWriter.h"
+#include "ZULMetaData/RecordingInfo.h"
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 #include "ZULMetaData/ZULMMetaDataReader.h"

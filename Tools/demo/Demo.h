@@ -1,0 +1,11 @@
+#pragma once
+
+#include "Platform/FileLocation.h"
+
+namespace ZULMetaData::Demo {
+
+/// Records a session into stream files in `folder`, attaches them to `movie`, stamps it, reads everything back out of
+/// it and prints a table. True where all that was read is what was recorded.
+bool runDemo(const FileLocation& folder, const FileLocation& movie);
+
+} // namespace ZULMetaData::Demo

@@ -1,0 +1,92 @@
+#include "ZULMetaData/ContainerLayout.h"
+
+#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/PositionedInput.h"
+
+#include <cstring>
+#include <limits>
+
+namespace ZULMetaData {
+
+namespace {
+
+constexpr std::uint64_t s_anywhere = std::numeric_limits<std::uint64_t>::max();
+
+std::string fourCharacters(std::uint32_t storedType) {
+    std::string characters(sizeof storedType, '\0');
+    std::memcpy(characters.data(), &storedType, sizeof storedType);
+    return characters;
+}
+
+/// Positions the stream, whatever its state, and counts from there.
+detail::PositionedInput inputAt(std::istream& stream, std::uint64_t position, std::uint64_t total) {
+    stream.clear();
+    stream.seekg(0);
+    detail::PositionedInput input(stream, 0, total);
+    input.moveTo(position);
+    return input;
+}
+
+bool readAtom(detail::PositionedInput& input, ContainerItem& atom) {
+    std::uint32_t type = 0;
+    atom.offset = input.position();
+    if (!input.readAtomSizeAndType(atom.size, type))
+        return false;
+    atom.type = fourCharacters(swapInt(type));
+    atom.headerSize = input.position() - atom.offset;
+    return true;
+}
+
+bool readChunk(detail::PositionedInput& input, ContainerItem& chunk) {
+    std::uint32_t type = 0;
+    std::uint32_t size = 0;
+    chunk.offset = input.position();
+    if (!input.readChunkTypeAndSize(type, size))
+        return false;
+    chunk.type = fourCharacters(type);
+    chunk.headerSize = detail::s_chunkHeaderSize;
+    chunk.size = chunk.headerSize + size;
+    return true;
+}
+
+/// `endOf` gives where the next item begins.
+template <class Read, class EndOf>
+std::vector<ContainerItem> listItems(detail::PositionedInput input, std::uint64_t end, Read read, EndOf endOf) {
+    std::vector<ContainerItem> items;
+    while (input.position() < end && input.position() < input.total()) {
+        ContainerItem item;
+        if (!read(input, item))
+            break;
+        items.push_back(item);
+        const std::uint64_t next = endOf(item);
+        if (next <= item.offset || !input.moveTo(next))
+            break;
+    }
+    return items;
+}
+
+} // namespace
+
+std::vector<ContainerItem> listAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end,
+                                     std::uint64_t total) {
+    return listItems(inputAt(stream, begin, total), end, readAtom,
+                     [](const ContainerItem& atom) { return atom.end(); });
+}
+
+std::vector<ContainerItem> listChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end,
+                                      std::uint64_t total) {
+    return listItems(inputAt(stream, begin, total), end, readChunk,
+                     [](const ContainerItem& chunk) { return chunk.end() + chunk.size % 2; });
+}
+
+std::vector<ContainerItem> listTopLevel(std::istream& stream, MetaDataParser::StreamType type) {
+    stream.clear();
+    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+    switch (type) {
+    case MetaDataParser::QuickTime: return listAtoms(stream, 0, s_anywhere, total);
+    case MetaDataParser::Riff: return listChunks(stream, 0, s_anywhere, total);
+    default: return {};
+    }
+}
+
+} // namespace ZULMetaData

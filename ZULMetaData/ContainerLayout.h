@@ -1,0 +1,38 @@
+#pragma once
+
+// The atoms of a movie or the chunks of a RIFF file as their headers declare them, for tools that show or check a
+// container. Nothing between the headers is read.
+
+#include "ZULMetaData/ZULMMetaDataParser.h"
+
+#include <cstdint>
+#include <istream>
+#include <string>
+#include <vector>
+
+namespace ZULMetaData {
+
+struct ContainerItem {
+    std::string type;         ///< four characters as they are stored, whatever bytes they are
+    std::uint64_t offset;     ///< where the header begins
+    std::uint64_t headerSize; ///< 8, or 16 for an atom in extended form
+    std::uint64_t size;       ///< of the whole item, header included, pad byte excluded. As declared: 0 is an open end
+
+    std::uint64_t payloadOffset() const { return offset + headerSize; }
+    std::uint64_t end() const { return offset + size; }
+
+    /// Of the payload, 0 where the declared size does not even cover the header.
+    std::uint64_t payloadSize() const { return size < headerSize ? 0 : size - headerSize; }
+};
+
+/// The items between `begin` and `end` of `stream`, which holds `total` bytes. Ends with the first item that nothing
+/// can follow: one with an open end, one whose end no file position can hold, or one that reaches beyond the total.
+/// Both clear the stream's state first.
+std::vector<ContainerItem> listAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total);
+std::vector<ContainerItem> listChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end,
+                                      std::uint64_t total);
+
+/// The items at the top of a container; none where `type` is a bare stream or unknown.
+std::vector<ContainerItem> listTopLevel(std::istream& stream, MetaDataParser::StreamType type);
+
+} // namespace ZULMetaData

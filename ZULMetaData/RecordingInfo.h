@@ -1,0 +1,14 @@
+#pragma once
+
+#include "SharedDependencies/ZCAPHeader.h"
+#include "ZULMetaData/ZULMMetaDataParser.h"
+
+#include <vector>
+
+namespace ZULMetaData {
+
+/// Who made a movie: what its top-level `ZULR` atoms hold, in the order of the file. The last one was stamped last.
+/// One too short to hold the record is left out.
+std::vector<ZCAPHeader> readRecordingInfo(MetaDataParser& movie);
+
+} // namespace ZULMetaData
