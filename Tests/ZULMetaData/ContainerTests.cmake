@@ -1,0 +1,1 @@
+zulm_add_test(ZULMetaData/ContainerScanTest)

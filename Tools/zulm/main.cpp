@@ -1,4 +1,5 @@
 #include "Tools/zulm/Command.h"
+#include "Tools/zulm/Settings.h"
 
 #include <fmt/core.h>
 
@@ -32,6 +33,8 @@ int main(int argc, char** argv) {
     app.footer(s_footer);
     app.set_version_flag("--version", "zulm " ZULM_VERSION);
     app.require_subcommand(1);
+    app.fallthrough();
+    addSettings(app);
     Action chosen;
     addInfoCommand(app, chosen);
     addDumpCommand(app, chosen);

@@ -1,0 +1,42 @@
+#pragma once
+
+// Files that appear whole or not at all.
+
+#include <string>
+#include <vector>
+
+namespace Zulm {
+
+/// Written beside its place under another name, then synced and renamed. What is not committed is removed, also when
+/// a signal ends the program.
+class OutputFile {
+public:
+    /// Throws `Failure` where `path` is one of `inputs` (whatever its name), or exists and `force` is not given.
+    OutputFile(const std::string& path, const std::vector<std::string>& inputs, bool force);
+    ~OutputFile();
+    OutputFile(const OutputFile&) = delete;
+    OutputFile& operator=(const OutputFile&) = delete;
+
+    /// Where to write: an empty file in the same folder and with the same extension, which tells containers apart.
+    const std::string& temporaryPath() const { return temporaryPath_; }
+
+    /// Fills the file with the bytes of `source`, showing progress. Throws `Failure`.
+    void copyFrom(const std::string& source);
+
+    /// Throws `Failure` where the file cannot be synced or renamed.
+    void commit();
+
+private:
+    std::string path_;
+    std::string temporaryPath_;
+    bool committed_ = false;
+};
+
+/// Writes `contents` as a whole file. Throws `Failure` as `OutputFile` does.
+void writeWholeFile(const std::string& path, const std::string& contents, const std::vector<std::string>& inputs,
+                    bool force);
+
+/// Whether both paths are the same file.
+bool isSameFile(const std::string& left, const std::string& right);
+
+} // namespace Zulm

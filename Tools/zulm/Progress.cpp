@@ -1,0 +1,60 @@
+#include "Tools/zulm/Progress.h"
+
+#include "Tools/zulm/Settings.h"
+
+#include <fmt/core.h>
+
+#include <array>
+#include <cstdio>
+#include <utility>
+
+namespace Zulm {
+
+namespace {
+
+using namespace std::chrono_literals;
+
+constexpr auto s_firstAfter = 500ms;
+constexpr auto s_interval = 100ms;
+
+} // namespace
+
+Progress::Progress(std::string what, std::uint64_t totalBytes)
+    : what_(std::move(what)), total_(totalBytes),
+      isEnabled_(!settings().quiet && !settings().noProgress && isTerminal(stderr)), next_(start_ + s_firstAfter) {}
+
+Progress::~Progress() {
+    if (isShown_)
+        fmt::print(stderr, "\r\033[K");
+}
+
+void Progress::moveTo(std::uint64_t done) {
+    done_ = done;
+    if (!isEnabled_)
+        return;
+    const auto now = Clock::now();
+    if (now >= next_)
+        show(now);
+}
+
+void Progress::show(Clock::time_point now) {
+    const double elapsed = std::chrono::duration<double>(now - start_).count();
+    const double share = total_ == 0 ? 1 : static_cast<double>(done_) / static_cast<double>(total_);
+    const double left = share > 0 ? elapsed / share - elapsed : 0;
+    fmt::print(stderr, "\r\033[K{}: {} of {} ({:.0f} %), {:.0f} s left", what_, bytesText(done_), bytesText(total_),
+               share * 100, left);
+    std::fflush(stderr);
+    isShown_ = true;
+    next_ = now + s_interval;
+}
+
+std::string bytesText(std::uint64_t bytes) {
+    constexpr std::array units{"bytes", "kB", "MB", "GB", "TB"};
+    auto value = static_cast<double>(bytes);
+    std::size_t unit = 0;
+    for (; value >= 1000 && unit + 1 < units.size(); ++unit)
+        value /= 1000;
+    return unit == 0 ? fmt::format("{} bytes", bytes) : fmt::format("{:.1f} {}", value, units[unit]);
+}
+
+} // namespace Zulm

@@ -1,0 +1,32 @@
+#!/usr/bin/env bash
+# Records a simulated session of 20 seconds, puts it into a movie, reads it back and checks that it is the same.
+# Usage: scripts/demo.sh [FOLDER]; everything is left in FOLDER (demo-output where none is named).
+set -euo pipefail
+cd "$(dirname "$0")/.."
+folder=${1:-demo-output}
+
+scripts/install.sh build media
+
+echo "== building"
+cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF >/dev/null
+cmake --build --preset release --target zulm zulm-demo
+
+echo "== making a movie of 20 seconds"
+mkdir -p "$folder"
+movie=$folder/Recording.mp4
+ffmpeg -v error -y -f lavfi -i testsrc2=size=1280x720:rate=30 -f lavfi -i sine=frequency=330 -t 20 \
+    -c:v libx264 -preset ultrafast -pix_fmt yuv420p -c:a aac "$movie"
+packets_before=$(ffmpeg -v error -i "$movie" -map 0 -c copy -f streamhash -)
+
+echo "== recording a session and reading it back out of the movie"
+build/release/Tools/demo/zulm-demo "$folder/streams" "$movie"
+
+echo "== the movie's pictures and sound are what they were"
+[ "$(ffmpeg -v error -i "$movie" -map 0 -c copy -f streamhash -)" = "$packets_before" ]
+ffprobe -v error -show_entries stream=codec_name,duration -of compact=nokey=1:print_section=0 "$movie"
+
+echo "== what zulm shows of it"
+build/release/Tools/zulm/zulm info "$movie"
+
+echo
+echo "The movie is $movie, its stream files are in $folder/streams."

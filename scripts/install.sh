@@ -1,0 +1,28 @@
+#!/usr/bin/env bash
+# Installs what this project needs from Debian's packages: scripts/install.sh GROUP...
+# Does nothing where it is there already.
+set -euo pipefail
+
+build=(g++ cmake ninja-build ccache libpng-dev libtiff-dev libcli11-dev nlohmann-json3-dev libfmt-dev)
+media=(ffmpeg)
+test=(libgtest-dev libgmock-dev imagemagick pngcheck libimage-exiftool-perl mediainfo)
+check=(clang clang-format git)
+
+packages=()
+for group in "$@"; do
+    declare -n members=$group
+    packages+=("${members[@]}")
+done
+
+missing=()
+for package in "${packages[@]}"; do
+    dpkg-query -W -f='${Status}' "$package" 2>/dev/null | grep -q 'install ok installed' || missing+=("$package")
+done
+[ ${#missing[@]} -eq 0 ] && exit 0
+
+echo "== installing ${missing[*]}"
+as_root=()
+[ "$(id -u)" -eq 0 ] || as_root=(sudo)
+export DEBIAN_FRONTEND=noninteractive
+"${as_root[@]}" apt-get update -qq
+"${as_root[@]}" apt-get install -y -qq --no-install-recommends "${missing[@]}" >/dev/null
