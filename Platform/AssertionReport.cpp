@@ -1,0 +1,17 @@
+#include "Platform/AssertionReport.h"
+
+// The C library declares its reporting function only where `assert` is active.
+#undef NDEBUG
+#include <cassert>
+
+namespace ZULMetaData {
+
+void reportFailedAssertion(const char* expression, const char* function, const char* file, int line) noexcept {
+#if defined(__APPLE__)
+    __assert_rtn(function, file, line, expression);
+#else
+    __assert_fail(expression, file, static_cast<unsigned int>(line), function);
+#endif
+}
+
+} // namespace ZULMetaData

@@ -1,0 +1,56 @@
+#pragma once
+
+// A picture in memory and the bitmap made from its TIFF data: with them a cursor image becomes PNG bytes and comes
+// back. Everything happens in memory. What a codec cannot read or write is "no image", without a message; only
+// std::bad_alloc, for pixels that memory has no room for, leaves these functions as an exception.
+
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <vector>
+
+namespace ZULMetaData {
+
+class Image {
+public:
+    /// `rgba` holds width * height pixels of four bytes (red, green, blue, straight alpha), rows from the top without
+    /// padding. Any other amount is kept as it is; such an image cannot be encoded, and neither can one with a side
+    /// of 0 or of more than 16384 pixels.
+    Image(std::uint32_t width, std::uint32_t height, std::vector<std::uint8_t> rgba);
+
+    /// Decodes a whole PNG or TIFF file of at most 16384 pixels a side. A file that is damaged, cut short, or claims
+    /// more pixels than its bytes can hold gives no image.
+    static std::optional<Image> fromEncodedBytes(std::span<const std::uint8_t> encoded);
+
+    std::uint32_t width() const noexcept { return width_; }
+    std::uint32_t height() const noexcept { return height_; }
+
+    /// Valid as long as the image.
+    std::span<const std::uint8_t> rgba() const noexcept { return rgba_; }
+
+    /// Uncompressed and lossless, also for the colours of pixels that are fully transparent. Empty where the image
+    /// cannot be encoded.
+    std::vector<std::uint8_t> tiffRepresentation() const;
+
+private:
+    std::uint32_t width_;
+    std::uint32_t height_;
+    std::vector<std::uint8_t> rgba_;
+};
+
+/// The pixels of a TIFF file, ready to be encoded again.
+class BitmapImageRep {
+public:
+    /// Takes TIFF data only, under the conditions of Image::fromEncodedBytes.
+    static std::optional<BitmapImageRep> fromTIFF(std::span<const std::uint8_t> tiff);
+
+    /// RGBA of 8 bits a channel, lossless like the TIFF representation.
+    std::vector<std::uint8_t> pngRepresentation() const;
+
+private:
+    explicit BitmapImageRep(Image image);
+
+    Image image_;
+};
+
+} // namespace ZULMetaData

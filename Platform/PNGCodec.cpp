@@ -1,0 +1,209 @@
+#include "Platform/PNGCodec.h"
+
+#include "Platform/ImageLimits.h"
+
+#include <png.h>
+
+#include <algorithm>
+#include <csetjmp>
+#include <new>
+#include <type_traits>
+#include <utility>
+
+namespace ZULMetaData {
+
+namespace {
+
+constexpr std::size_t s_signatureSize = 8;
+
+[[noreturn]] void jumpOut(png_structp png, png_const_charp) {
+    png_longjmp(png, 1);
+}
+
+void ignoreWarning(png_structp, png_const_charp) {}
+
+// libpng leaves a failed call by a jump, which runs no destructor: between here and libpng nothing may need one.
+// What has to be released belongs to a PNGReader or PNGWriter of the caller.
+template <class Steps>
+bool unlessLibraryJumps(png_structp png, Steps steps) {
+    static_assert(std::is_trivially_destructible_v<Steps>);
+    if (setjmp(png_jmpbuf(png)) != 0) {
+        return false;
+    }
+    steps();
+    return true;
+}
+
+class PNGReader {
+public:
+    explicit PNGReader(std::span<const std::uint8_t> encoded)
+        : encoded_(encoded), remaining_(encoded),
+          png_(png_create_read_struct(PNG_LIBPNG_VER_STRING, nullptr, jumpOut, ignoreWarning)),
+          info_(png_ != nullptr ? png_create_info_struct(png_) : nullptr) {}
+    PNGReader(const PNGReader&) = delete;
+    PNGReader& operator=(const PNGReader&) = delete;
+    ~PNGReader() { png_destroy_read_struct(&png_, &info_, nullptr); }
+
+    std::uint32_t width() const { return width_; }
+    std::uint32_t height() const { return height_; }
+
+    bool readHeader() {
+        return info_ != nullptr && unlessLibraryJumps(png_, [this] {
+                   beStrict();
+                   png_read_info(png_, info_);
+                   noteLayout();
+                   convertToRGBA();
+               });
+    }
+
+    bool isPlausible() const {
+        return isImageSizeAllowed(width_, height_) && png_get_rowbytes(png_, info_) == rgbaSize(width_, 1) &&
+               storedSize_ / s_maximumDeflateRatio <= encoded_.size();
+    }
+
+    bool readPixels(std::uint8_t* rgba) {
+        return unlessLibraryJumps(png_, [this, rgba] {
+            for (int pass = 0; pass < passes_; ++pass) {
+                for (std::uint32_t row = 0; row < height_; ++row) {
+                    png_read_row(png_, rgba + rgbaSize(width_, row), nullptr);
+                }
+            }
+            png_read_end(png_, nullptr);
+        });
+    }
+
+private:
+    void beStrict() {
+        png_set_read_fn(png_, this, takeBytes);
+        png_set_user_limits(png_, s_maximumImageSide, s_maximumImageSide);
+        png_set_benign_errors(png_, 0);
+        png_set_crc_action(png_, PNG_CRC_ERROR_QUIT, PNG_CRC_ERROR_QUIT);
+        // Texts, profiles and the like are not used, and unpacking them would cost memory.
+        png_set_keep_unknown_chunks(png_, PNG_HANDLE_CHUNK_NEVER, nullptr, -1);
+    }
+
+    void noteLayout() {
+        width_ = png_get_image_width(png_, info_);
+        height_ = png_get_image_height(png_, info_);
+        storedSize_ = std::uint64_t{png_get_rowbytes(png_, info_)} * height_;
+    }
+
+    void convertToRGBA() {
+        png_set_scale_16(png_);
+        png_set_expand(png_);
+        png_set_gray_to_rgb(png_);
+        png_set_add_alpha(png_, 0xFF, PNG_FILLER_AFTER);
+        passes_ = png_set_interlace_handling(png_);
+        png_read_update_info(png_, info_);
+    }
+
+    static void takeBytes(png_structp png, png_bytep target, png_size_t count) {
+        auto& remaining = static_cast<PNGReader*>(png_get_io_ptr(png))->remaining_;
+        if (count > remaining.size()) {
+            png_error(png, "file is cut short");
+        }
+        std::copy_n(remaining.begin(), count, target);
+        remaining = remaining.subspan(count);
+    }
+
+    std::span<const std::uint8_t> encoded_;
+    std::span<const std::uint8_t> remaining_;
+    png_structp png_;
+    png_infop info_;
+    std::uint32_t width_ = 0;
+    std::uint32_t height_ = 0;
+    std::uint64_t storedSize_ = 0; // bytes of all rows before compression, in the file's own pixel format
+    int passes_ = 0;
+};
+
+class PNGWriter {
+public:
+    PNGWriter()
+        : png_(png_create_write_struct(PNG_LIBPNG_VER_STRING, nullptr, jumpOut, ignoreWarning)),
+          info_(png_ != nullptr ? png_create_info_struct(png_) : nullptr) {}
+    PNGWriter(const PNGWriter&) = delete;
+    PNGWriter& operator=(const PNGWriter&) = delete;
+    ~PNGWriter() { png_destroy_write_struct(&png_, &info_); }
+
+    bool write(const Image& image) {
+        return info_ != nullptr && unlessLibraryJumps(png_, [this, &image] {
+                   png_set_write_fn(png_, this, appendBytes, nullptr);
+                   png_set_IHDR(png_, info_, image.width(), image.height(), 8, PNG_COLOR_TYPE_RGB_ALPHA,
+                                PNG_INTERLACE_NONE, PNG_COMPRESSION_TYPE_DEFAULT, PNG_FILTER_TYPE_DEFAULT);
+                   preferSpeed();
+                   png_write_info(png_, info_);
+                   const std::uint8_t* rgba = image.rgba().data();
+                   for (std::uint32_t row = 0; row < image.height(); ++row) {
+                       png_write_row(png_, rgba + rgbaSize(image.width(), row));
+                   }
+                   png_write_end(png_, nullptr);
+               });
+    }
+
+    bool isOutOfMemory() const { return outOfMemory_; }
+    std::vector<std::uint8_t> takeEncoded() { return std::move(encoded_); }
+
+private:
+    // A recording encodes its cursors while it runs. They are small pictures of flat colours and repeated rows: the
+    // fastest compression without filters loses a few per cent of size on them and takes a fraction of the time.
+    void preferSpeed() {
+        png_set_compression_level(png_, 1);
+        png_set_filter(png_, PNG_FILTER_TYPE_BASE, PNG_FILTER_NONE);
+    }
+
+    static void appendBytes(png_structp png, png_bytep bytes, png_size_t count) {
+        auto& writer = *static_cast<PNGWriter*>(png_get_io_ptr(png));
+        if (!writer.append(bytes, count)) {
+            png_error(png, "out of memory");
+        }
+    }
+
+    // An exception must not travel through libpng either; the caller raises it again behind the jump.
+    bool append(const std::uint8_t* bytes, std::size_t count) noexcept {
+        try {
+            encoded_.insert(encoded_.end(), bytes, bytes + count);
+        } catch (const std::bad_alloc&) {
+            outOfMemory_ = true;
+        }
+        return !outOfMemory_;
+    }
+
+    std::vector<std::uint8_t> encoded_;
+    bool outOfMemory_ = false;
+    png_structp png_;
+    png_infop info_;
+};
+
+} // namespace
+
+bool hasPNGSignature(std::span<const std::uint8_t> encoded) noexcept {
+    return encoded.size() >= s_signatureSize && png_sig_cmp(encoded.data(), 0, s_signatureSize) == 0;
+}
+
+std::optional<Image> decodePNG(std::span<const std::uint8_t> encoded) {
+    PNGReader reader(encoded);
+    if (!reader.readHeader() || !reader.isPlausible()) {
+        return std::nullopt;
+    }
+    std::vector<std::uint8_t> rgba(rgbaSize(reader.width(), reader.height()));
+    if (!reader.readPixels(rgba.data())) {
+        return std::nullopt;
+    }
+    return Image(reader.width(), reader.height(), std::move(rgba));
+}
+
+std::vector<std::uint8_t> encodePNG(const Image& image) {
+    if (!isEncodable(image)) {
+        return {};
+    }
+    PNGWriter writer;
+    if (writer.write(image)) {
+        return writer.takeEncoded();
+    }
+    if (writer.isOutOfMemory()) {
+        throw std::bad_alloc();
+    }
+    return {};
+}
+
+} // namespace ZULMetaData

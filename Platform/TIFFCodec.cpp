@@ -1,0 +1,349 @@
+#include "Platform/TIFFCodec.h"
+
+#include "Platform/ImageLimits.h"
+
+#include <tiffio.h>
+
+#include <algorithm>
+#include <array>
+#include <cstdarg>
+#include <cstdio>
+#include <cstring>
+#include <limits>
+#include <memory>
+#include <utility>
+
+#if TIFFLIB_VERSION < 20221213
+#error "libtiff 4.5 or newer is needed: only it reports errors to the handle that they belong to"
+#endif
+
+namespace ZULMetaData {
+
+namespace {
+
+constexpr const char* s_handleName = "image";
+
+// ---- what libtiff reads from and writes to ----
+
+struct Input {
+    std::span<const std::uint8_t> bytes;
+    std::uint64_t position = 0;
+    bool cutShort = false; // whether bytes behind the end were asked for
+};
+
+// Never grows behind its reserved capacity, so that no exception can arise inside libtiff.
+struct Output {
+    std::vector<std::uint8_t> bytes;
+    std::uint64_t position = 0;
+};
+
+tmsize_t readBytes(thandle_t handle, void* target, tmsize_t size) {
+    auto& input = *static_cast<Input*>(handle);
+    const auto wanted = static_cast<std::uint64_t>(std::max<tmsize_t>(size, 0));
+    const auto left = input.bytes.size() - std::min<std::uint64_t>(input.position, input.bytes.size());
+    const auto count = std::min<std::uint64_t>(wanted, left);
+    input.cutShort = input.cutShort || count < wanted;
+    std::copy_n(input.bytes.last(left).begin(), count, static_cast<std::uint8_t*>(target));
+    input.position += count;
+    return static_cast<tmsize_t>(count);
+}
+
+tmsize_t writeBytes(thandle_t handle, void* source, tmsize_t size) {
+    auto& output = *static_cast<Output*>(handle);
+    const auto capacity = output.bytes.capacity();
+    if (size <= 0 || output.position > capacity || static_cast<std::uint64_t>(size) > capacity - output.position) {
+        return 0;
+    }
+    const auto end = output.position + static_cast<std::uint64_t>(size);
+    output.bytes.resize(std::max<std::size_t>(output.bytes.size(), end));
+    std::memcpy(output.bytes.data() + output.position, source, static_cast<std::size_t>(size));
+    output.position = end;
+    return size;
+}
+
+tmsize_t refuse(thandle_t, void*, tmsize_t) {
+    return 0;
+}
+
+template <class Stream>
+toff_t seek(thandle_t handle, toff_t offset, int origin) {
+    auto& stream = *static_cast<Stream*>(handle);
+    const std::uint64_t base = origin == SEEK_CUR ? stream.position : origin == SEEK_END ? stream.bytes.size() : 0;
+    const std::uint64_t target = base + offset;
+    if (target > static_cast<std::uint64_t>(std::numeric_limits<std::int64_t>::max())) {
+        return static_cast<toff_t>(-1);
+    }
+    return stream.position = target;
+}
+
+template <class Stream>
+toff_t sizeOf(thandle_t handle) {
+    return static_cast<Stream*>(handle)->bytes.size();
+}
+
+int leaveOpen(thandle_t) {
+    return 0;
+}
+
+// ---- handles that keep their troubles to themselves ----
+
+struct Troubles {
+    bool error = false;
+    bool warning = false;
+};
+
+// The result 1 keeps libtiff from calling the handlers of the whole process.
+int noteError(TIFF*, void* troubles, const char*, const char*, va_list) {
+    static_cast<Troubles*>(troubles)->error = true;
+    return 1;
+}
+
+int noteWarning(TIFF*, void* troubles, const char*, const char*, va_list) {
+    static_cast<Troubles*>(troubles)->warning = true;
+    return 1;
+}
+
+struct Deleter {
+    void operator()(TIFF* tiff) const { TIFFClose(tiff); }
+    void operator()(TIFFOpenOptions* options) const { TIFFOpenOptionsFree(options); }
+};
+
+using Handle = std::unique_ptr<TIFF, Deleter>;
+
+std::unique_ptr<TIFFOpenOptions, Deleter> quietOptions(Troubles& troubles) {
+    std::unique_ptr<TIFFOpenOptions, Deleter> options(TIFFOpenOptionsAlloc());
+    if (options) {
+        TIFFOpenOptionsSetErrorHandlerExtR(options.get(), noteError, &troubles);
+        TIFFOpenOptionsSetWarningHandlerExtR(options.get(), noteWarning, &troubles);
+    }
+    return options;
+}
+
+// ---- decoding ----
+
+// A string as long as the whole table, 4096 bytes, from a code of 12 bits. No other ratio here is better.
+constexpr std::uint64_t s_maximumLZWRatio = 2800;
+
+// How many bytes of pixels one byte of the file can stand for at best; 0 for a compression that is not read. Those
+// left out hide damage (fax), are hardly met in small pictures, or have no useful bound.
+std::uint64_t maximumRatio(std::uint16_t compression) {
+    switch (compression) {
+    case COMPRESSION_NONE: return 1;
+    case COMPRESSION_PACKBITS: return 64; // 128 bytes from 2
+    case COMPRESSION_LZW: return s_maximumLZWRatio;
+    case COMPRESSION_JPEG: return 1600; // a block of 64 pixels, three bytes each, from one bit
+    case COMPRESSION_DEFLATE:
+    case COMPRESSION_ADOBE_DEFLATE: return s_maximumDeflateRatio;
+    default: return 0;
+    }
+}
+
+// No block that libtiff may ask for is larger: neither a 16-bit RGBA picture of the largest size nor what the best
+// ratio makes of this file. The constant leaves room for tables.
+tmsize_t allocationLimit(std::size_t encodedSize) {
+    constexpr std::uint64_t largest = std::uint64_t{8} * s_maximumImageSide * s_maximumImageSide;
+    constexpr std::uint64_t tables = std::uint64_t{1} << 20;
+    const auto plausible = std::min<std::uint64_t>(encodedSize, largest) * s_maximumLZWRatio + tables;
+    return static_cast<tmsize_t>(std::min(plausible, largest));
+}
+
+Handle openForReading(Input& input, Troubles& troubles) {
+    const auto options = quietOptions(troubles);
+    if (!options) {
+        return nullptr;
+    }
+    TIFFOpenOptionsSetMaxSingleMemAlloc(options.get(), allocationLimit(input.bytes.size()));
+    return Handle(TIFFClientOpenExt(s_handleName, "rm", &input, readBytes, refuse, seek<Input>, leaveOpen,
+                                    sizeOf<Input>, nullptr, nullptr, options.get()));
+}
+
+// One number of a directory, or its default; 0 where it has neither.
+template <class Number>
+Number field(TIFF* tiff, std::uint32_t tag) {
+    Number value = 0;
+    return TIFFGetFieldDefaulted(tiff, tag, &value) == 1 ? value : Number{0};
+}
+
+// All strips or tiles together may not unpack to more than the file can hold, also where they share their bytes.
+bool isPlausible(TIFF* tiff, std::uint32_t height, std::size_t encodedSize) {
+    const auto ratio = maximumRatio(field<std::uint16_t>(tiff, TIFFTAG_COMPRESSION));
+    const auto planes = field<std::uint16_t>(tiff, TIFFTAG_PLANARCONFIG) == PLANARCONFIG_SEPARATE
+                            ? field<std::uint16_t>(tiff, TIFFTAG_SAMPLESPERPIXEL)
+                            : std::uint16_t{1};
+    const bool tiled = TIFFIsTiled(tiff) != 0;
+    const std::uint64_t pieceSize = tiled ? TIFFTileSize64(tiff) : TIFFScanlineSize64(tiff);
+    const std::uint64_t pieces = tiled ? TIFFNumberOfTiles(tiff) : std::uint64_t{height} * planes;
+    return pieceSize > 0 && pieces > 0 && pieceSize <= ratio * encodedSize / pieces;
+}
+
+// libtiff multiplies colours by a straight alpha, which loses them where alpha is small. It leaves them alone where
+// alpha is marked as premultiplied, so the handle (not the file) is told that it is. Gives whether it really is.
+bool markAlphaAsPremultiplied(TIFF* tiff) {
+    std::uint16_t count = 0;
+    std::uint16_t* kinds = nullptr;
+    if (TIFFGetField(tiff, TIFFTAG_EXTRASAMPLES, &count, &kinds) != 1 || count == 0) {
+        return false;
+    }
+    const bool premultiplied = kinds[0] == EXTRASAMPLE_ASSOCALPHA;
+    std::vector<std::uint16_t> marked(kinds, kinds + count);
+    marked[0] = EXTRASAMPLE_ASSOCALPHA;
+    TIFFSetField(tiff, TIFFTAG_EXTRASAMPLES, count, marked.data());
+    return premultiplied;
+}
+
+// libtiff knows how to mirror but not how to turn by a quarter. A turned picture is mirrored so that its transpose is
+// upright. Gives whether it has to be transposed.
+bool mirrorInsteadOfTurning(TIFF* tiff) {
+    constexpr std::array<std::pair<std::uint16_t, std::uint16_t>, 4> mirrors{
+        {{ORIENTATION_LEFTTOP, ORIENTATION_TOPLEFT},
+         {ORIENTATION_RIGHTTOP, ORIENTATION_BOTLEFT},
+         {ORIENTATION_RIGHTBOT, ORIENTATION_BOTRIGHT},
+         {ORIENTATION_LEFTBOT, ORIENTATION_TOPRIGHT}}};
+    const auto orientation = field<std::uint16_t>(tiff, TIFFTAG_ORIENTATION);
+    for (const auto& [turned, mirrored] : mirrors) {
+        if (orientation == turned) {
+            TIFFSetField(tiff, TIFFTAG_ORIENTATION, mirrored);
+            return true;
+        }
+    }
+    return false;
+}
+
+// Whether libtiff hands the samples over as what they are: colours that need no conversion by guesswork, together
+// with their alpha.
+bool isReadInFull(const TIFFRGBAImage& image, TIFF* tiff) {
+    const auto format = field<std::uint16_t>(tiff, TIFFTAG_SAMPLEFORMAT);
+    if (format != SAMPLEFORMAT_UINT && format != SAMPLEFORMAT_VOID) {
+        return false;
+    }
+    const bool alphaStored = field<std::uint16_t>(tiff, TIFFTAG_SAMPLESPERPIXEL) > 1;
+    switch (image.photometric) {
+    case PHOTOMETRIC_RGB: return true;
+    case PHOTOMETRIC_PALETTE: return !alphaStored;
+    case PHOTOMETRIC_MINISWHITE:
+    case PHOTOMETRIC_MINISBLACK:
+        return !alphaStored || (image.isContig != 0 && image.bitspersample == 8 && image.samplesperpixel == 2);
+    default: return false;
+    }
+}
+
+// Fills `rgba` with one pixel per 32-bit word, red in the lowest byte.
+bool readWords(TIFF* tiff, std::uint32_t width, std::uint32_t height, std::vector<std::uint8_t>& rgba) {
+    TIFFRGBAImage image{};
+    char reason[1024] = {};
+    constexpr int stopOnError = 1;
+    if (TIFFRGBAImageOK(tiff, reason) != 1 || TIFFRGBAImageBegin(&image, tiff, stopOnError, reason) != 1) {
+        return false;
+    }
+    image.req_orientation = ORIENTATION_TOPLEFT;
+    const bool read = isReadInFull(image, tiff) &&
+                      TIFFRGBAImageGet(&image, reinterpret_cast<std::uint32_t*>(rgba.data()), width, height) == 1;
+    TIFFRGBAImageEnd(&image);
+    return read;
+}
+
+void wordsToBytes(std::vector<std::uint8_t>& rgba) {
+    for (std::size_t i = 0; i < rgba.size(); i += 4) {
+        std::uint32_t word = 0;
+        std::memcpy(&word, &rgba[i], sizeof word);
+        rgba[i] = static_cast<std::uint8_t>(TIFFGetR(word));
+        rgba[i + 1] = static_cast<std::uint8_t>(TIFFGetG(word));
+        rgba[i + 2] = static_cast<std::uint8_t>(TIFFGetB(word));
+        rgba[i + 3] = static_cast<std::uint8_t>(TIFFGetA(word));
+    }
+}
+
+void undoPremultiplication(std::vector<std::uint8_t>& rgba) {
+    for (std::size_t i = 0; i < rgba.size(); i += 4) {
+        const unsigned alpha = rgba[i + 3];
+        for (std::size_t channel = i; channel < i + 3; ++channel) {
+            const unsigned straight = alpha == 0 ? 0 : (rgba[channel] * 255U + alpha / 2) / alpha;
+            rgba[channel] = static_cast<std::uint8_t>(std::min(straight, 255U));
+        }
+    }
+}
+
+Image transposed(std::uint32_t width, std::uint32_t height, const std::vector<std::uint8_t>& rgba) {
+    std::vector<std::uint8_t> turned(rgba.size());
+    for (std::uint32_t y = 0; y < height; ++y) {
+        for (std::uint32_t x = 0; x < width; ++x) {
+            std::memcpy(&turned[rgbaSize(height, x) + 4 * std::size_t{y}],
+                        &rgba[rgbaSize(width, y) + 4 * std::size_t{x}], 4);
+        }
+    }
+    return {height, width, std::move(turned)};
+}
+
+// ---- encoding ----
+
+bool describe(TIFF* tiff, const Image& image) {
+    constexpr std::uint16_t alphaKind = EXTRASAMPLE_UNASSALPHA;
+    return TIFFSetField(tiff, TIFFTAG_IMAGEWIDTH, image.width()) == 1 &&
+           TIFFSetField(tiff, TIFFTAG_IMAGELENGTH, image.height()) == 1 &&
+           TIFFSetField(tiff, TIFFTAG_SAMPLESPERPIXEL, 4) == 1 && TIFFSetField(tiff, TIFFTAG_BITSPERSAMPLE, 8) == 1 &&
+           TIFFSetField(tiff, TIFFTAG_EXTRASAMPLES, 1, &alphaKind) == 1 &&
+           TIFFSetField(tiff, TIFFTAG_PHOTOMETRIC, PHOTOMETRIC_RGB) == 1 &&
+           TIFFSetField(tiff, TIFFTAG_COMPRESSION, COMPRESSION_NONE) == 1 &&
+           TIFFSetField(tiff, TIFFTAG_PLANARCONFIG, PLANARCONFIG_CONTIG) == 1 &&
+           TIFFSetField(tiff, TIFFTAG_ORIENTATION, ORIENTATION_TOPLEFT) == 1 &&
+           TIFFSetField(tiff, TIFFTAG_ROWSPERSTRIP, image.height()) == 1;
+}
+
+bool writePixels(TIFF* tiff, const Image& image) {
+    const auto size = static_cast<tmsize_t>(image.rgba().size());
+    // Uncompressed samples of one byte are only read, whatever the parameter's type says.
+    auto* rgba = const_cast<std::uint8_t*>(image.rgba().data());
+    return TIFFWriteEncodedStrip(tiff, 0, rgba, size) == size;
+}
+
+} // namespace
+
+std::optional<Image> decodeTIFF(std::span<const std::uint8_t> encoded) {
+    Troubles troubles;
+    Input input{encoded};
+    const Handle tiff = openForReading(input, troubles);
+    if (!tiff) {
+        return std::nullopt;
+    }
+    const auto width = field<std::uint32_t>(tiff.get(), TIFFTAG_IMAGEWIDTH);
+    const auto height = field<std::uint32_t>(tiff.get(), TIFFTAG_IMAGELENGTH);
+    if (!isImageSizeAllowed(width, height) || !isPlausible(tiff.get(), height, encoded.size())) {
+        return std::nullopt;
+    }
+    const bool premultiplied = markAlphaAsPremultiplied(tiff.get());
+    const bool sideways = mirrorInsteadOfTurning(tiff.get());
+    std::vector<std::uint8_t> rgba(rgbaSize(width, height));
+    // A directory may hold tags that libtiff only warns about. A warning about the pixels means that some are lost.
+    troubles.warning = false;
+    const bool read = readWords(tiff.get(), width, height, rgba);
+    if (!read || troubles.error || troubles.warning || input.cutShort) {
+        return std::nullopt;
+    }
+    wordsToBytes(rgba);
+    if (premultiplied) {
+        undoPremultiplication(rgba);
+    }
+    return sideways ? transposed(width, height, rgba) : Image(width, height, std::move(rgba));
+}
+
+std::vector<std::uint8_t> encodeTIFF(const Image& image) {
+    if (!isEncodable(image)) {
+        return {};
+    }
+    constexpr std::size_t roomForDirectory = 4096;
+    Troubles troubles;
+    Output output;
+    output.bytes.reserve(image.rgba().size() + roomForDirectory);
+    const auto options = quietOptions(troubles);
+    if (!options) {
+        return {};
+    }
+    Handle tiff(TIFFClientOpenExt(s_handleName, "wlm", &output, refuse, writeBytes, seek<Output>, leaveOpen,
+                                  sizeOf<Output>, nullptr, nullptr, options.get()));
+    const bool written =
+        tiff && describe(tiff.get(), image) && writePixels(tiff.get(), image) && TIFFWriteDirectory(tiff.get()) == 1;
+    tiff.reset();
+    return written && !troubles.error ? std::move(output.bytes) : std::vector<std::uint8_t>();
+}
+
+} // namespace ZULMetaData

@@ -1,0 +1,24 @@
+#pragma once
+
+// TIFF files to pixels and back.
+
+#include "Platform/Image.h"
+
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <vector>
+
+namespace ZULMetaData {
+
+/// The first picture of a TIFF or BigTIFF file, turned upright: grey (1 to 16 bits), palette, RGB (8 or 16 bits) and
+/// JPEG's own colours, in strips or tiles, stored plain or with PackBits, LZW, deflate or JPEG. The first extra sample
+/// is alpha, straight unless it is marked as premultiplied. 16-bit samples are rounded to 8 bits; only 16-bit grey and
+/// the colours of a palette are rounded down. Anything else gives no image, and so does grey of other than 8 bits with
+/// alpha, which could only be read without it.
+std::optional<Image> decodeTIFF(std::span<const std::uint8_t> encoded);
+
+/// Little-endian, one uncompressed strip of RGBA with straight alpha. Empty where the image cannot be encoded.
+std::vector<std::uint8_t> encodeTIFF(const Image& image);
+
+} // namespace ZULMetaData
