@@ -17,7 +17,7 @@ std::string extensionOf(const std::string& path) {
     const std::size_t dot = path.rfind('.');
     std::string extension = dot == std::string::npos ? std::string() : path.substr(dot);
     const auto toLower = [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c; };
-    std::ranges::transform(extension, extension.begin(), toLower);
+    std::transform(extension.begin(), extension.end(), extension.begin(), toLower);
     return extension;
 }
 

@@ -6,7 +6,8 @@
 namespace ZULMetaData {
 
 const MetaDataKind* findMetaDataKind(const uuid& type) {
-    const auto kind = std::ranges::find(s_metaDataKinds, type, &MetaDataKind::type);
+    const auto isWanted = [&type](const MetaDataKind& kind) { return kind.type == type; };
+    const auto kind = std::find_if(s_metaDataKinds.begin(), s_metaDataKinds.end(), isWanted);
     return kind == s_metaDataKinds.end() ? nullptr : &*kind;
 }
 

@@ -1,1 +1,2 @@
 zulm_add_test(ZULMetaDataBridge/KindsTest)
+zulm_add_test(ZULMetaDataBridge/WriterFamilyTest)

@@ -13,7 +13,7 @@ const EntryValue& EntryDictionary::at(std::string_view key) const {
 }
 
 EntryDictionary::const_iterator EntryDictionary::find(std::string_view key) const {
-    const auto found = std::ranges::find(*keys_, key);
+    const auto found = std::find(keys_->begin(), keys_->end(), key);
     return {*this, static_cast<std::size_t>(found - keys_->begin())};
 }
 

@@ -100,12 +100,16 @@ constexpr std::array<Named, 61> s_keys{{
     {190, "period"},
 }};
 
-static_assert(std::ranges::is_sorted(s_keys, {}, &Named::value));
+constexpr bool comesFirst(const Named& left, const Named& right) {
+    return left.value < right.value;
+}
+
+static_assert(std::is_sorted(s_keys.begin(), s_keys.end(), comesFirst));
 
 template <std::size_t Size>
 const Named* firstSet(const std::array<Named, Size>& names, int bits) {
     const auto isSet = [bits](const Named& name) { return HumanReadableActions::HasFlag(bits, name.value); };
-    const auto found = std::ranges::find_if(names, isSet);
+    const auto found = std::find_if(names.begin(), names.end(), isSet);
     return found == names.end() ? nullptr : &*found;
 }
 
@@ -141,7 +145,7 @@ std::string HumanReadableActions::CursorActionToString(int action) {
 }
 
 std::string HumanReadableActions::KeyboardActionCodeToString(int code) {
-    const auto key = std::ranges::lower_bound(s_keys, code, {}, &Named::value);
+    const auto key = std::lower_bound(s_keys.begin(), s_keys.end(), Named{code, {}}, comesFirst);
     if (key != s_keys.end() && key->value == code)
         return std::string(key->text);
     const char character = static_cast<char>(code & 0xff);

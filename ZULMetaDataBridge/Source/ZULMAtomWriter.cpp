@@ -12,7 +12,7 @@ namespace ZULMetaData {
 void ZULMAtomWriter::writeMetaDataFiles(const std::vector<FileLocation>& files, const FileLocation& toFile) const {
     ZULMAtomRepair::finalizeAtomsInFile(toFile);
     std::vector<std::string> paths;
-    std::ranges::transform(files, std::back_inserter(paths), utf8Path);
+    std::transform(files.begin(), files.end(), std::back_inserter(paths), utf8Path);
     MP4MetaData::appendMetaDataFiles(utf8Path(toFile), paths);
 }
 
