@@ -14,6 +14,10 @@ std::optional<Image> Image::fromEncodedBytes(std::span<const std::uint8_t> encod
     return hasPNGSignature(encoded) ? decodePNG(encoded) : decodeTIFF(encoded);
 }
 
+std::optional<EncodedImageInfo> Image::infoOfEncodedBytes(std::span<const std::uint8_t> encoded) {
+    return hasPNGSignature(encoded) ? readPNGInfo(encoded) : readTIFFInfo(encoded);
+}
+
 std::vector<std::uint8_t> Image::tiffRepresentation() const {
     return encodeTIFF(*this);
 }

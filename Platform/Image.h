@@ -11,6 +11,13 @@
 
 namespace ZULMetaData {
 
+/// What an encoded picture says of itself, for a caller who has to know before it is decoded.
+struct EncodedImageInfo {
+    std::uint32_t width;
+    std::uint32_t height;
+    std::uint64_t decodingMemory; ///< bytes that decoding asks for at most, beside the encoded ones
+};
+
 class Image {
 public:
     /// `rgba` holds width * height pixels of four bytes (red, green, blue, straight alpha), rows from the top without
@@ -21,6 +28,9 @@ public:
     /// Decodes a whole PNG or TIFF file of at most 16384 pixels a side. A file that is damaged, cut short, or claims
     /// more pixels than its bytes can hold gives no image.
     static std::optional<Image> fromEncodedBytes(std::span<const std::uint8_t> encoded);
+
+    /// Reads the headers alone. Nothing where they already rule out that the file decodes.
+    static std::optional<EncodedImageInfo> infoOfEncodedBytes(std::span<const std::uint8_t> encoded);
 
     std::uint32_t width() const noexcept { return width_; }
     std::uint32_t height() const noexcept { return height_; }

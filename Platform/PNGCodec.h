@@ -18,6 +18,9 @@ bool hasPNGSignature(std::span<const std::uint8_t> encoded) noexcept;
 /// the end chunk do not matter.
 std::optional<Image> decodePNG(std::span<const std::uint8_t> encoded);
 
+/// By its header; nothing where `decodePNG` would refuse it.
+std::optional<EncodedImageInfo> readPNGInfo(std::span<const std::uint8_t> encoded);
+
 /// RGBA of 8 bits a channel. Empty where the image cannot be encoded.
 std::vector<std::uint8_t> encodePNG(const Image& image);
 

@@ -164,16 +164,47 @@ Number field(TIFF* tiff, std::uint32_t tag) {
     return TIFFGetFieldDefaulted(tiff, tag, &value) == 1 ? value : Number{0};
 }
 
+struct Extent {
+    std::uint32_t width;
+    std::uint32_t height;
+};
+
+Extent extentOf(TIFF* tiff) {
+    return {field<std::uint32_t>(tiff, TIFFTAG_IMAGEWIDTH), field<std::uint32_t>(tiff, TIFFTAG_IMAGELENGTH)};
+}
+
 // All strips or tiles together may not unpack to more than the file can hold, also where they share their bytes.
-bool isPlausible(TIFF* tiff, std::uint32_t height, std::size_t encodedSize) {
+bool isPlausible(TIFF* tiff, Extent extent, std::size_t encodedSize) {
+    if (!isImageSizeAllowed(extent.width, extent.height)) {
+        return false;
+    }
     const auto ratio = maximumRatio(field<std::uint16_t>(tiff, TIFFTAG_COMPRESSION));
     const auto planes = field<std::uint16_t>(tiff, TIFFTAG_PLANARCONFIG) == PLANARCONFIG_SEPARATE
                             ? field<std::uint16_t>(tiff, TIFFTAG_SAMPLESPERPIXEL)
                             : std::uint16_t{1};
     const bool tiled = TIFFIsTiled(tiff) != 0;
     const std::uint64_t pieceSize = tiled ? TIFFTileSize64(tiff) : TIFFScanlineSize64(tiff);
-    const std::uint64_t pieces = tiled ? TIFFNumberOfTiles(tiff) : std::uint64_t{height} * planes;
+    const std::uint64_t pieces = tiled ? TIFFNumberOfTiles(tiff) : std::uint64_t{extent.height} * planes;
     return pieceSize > 0 && pieces > 0 && pieceSize <= ratio * encodedSize / pieces;
+}
+
+// What decoding may hold at a time: the pixels, twice where they are turned, a strip or tile of each plane that is
+// shown, and its bytes as they are stored, which libtiff asks for in growing steps until they turn out to be missing.
+std::uint64_t memoryToDecode(TIFF* tiff, Extent extent, std::size_t encodedSize) {
+    constexpr std::uint64_t firstStep = std::uint64_t{1} << 20;
+    constexpr std::uint64_t largestGrowth = 11;
+    constexpr std::uint64_t planes = 4;
+    const bool tiled = TIFFIsTiled(tiff) != 0;
+    const std::uint64_t pieceSize = tiled ? TIFFTileSize64(tiff) : TIFFStripSize64(tiff);
+    const std::uint32_t pieces = tiled ? TIFFNumberOfTiles(tiff) : TIFFNumberOfStrips(tiff);
+    std::uint64_t stored = 0;
+    for (std::uint32_t piece = 0; piece < pieces; ++piece) {
+        stored = std::max<std::uint64_t>(stored, TIFFGetStrileByteCount(tiff, piece));
+    }
+    const std::uint64_t read = std::min<std::uint64_t>(stored, largestGrowth * encodedSize + firstStep);
+    const std::uint64_t turned = field<std::uint16_t>(tiff, TIFFTAG_ORIENTATION) > ORIENTATION_BOTLEFT ? 2 : 1;
+    return turned * rgbaSize(extent.width, extent.height) + planes * pieceSize + read +
+           2 * sizeof(std::uint64_t) * pieces;
 }
 
 // libtiff multiplies colours by a straight alpha, which loses them where alpha is small. It leaves them alone where
@@ -298,6 +329,20 @@ bool writePixels(TIFF* tiff, const Image& image) {
 
 } // namespace
 
+std::optional<EncodedImageInfo> readTIFFInfo(std::span<const std::uint8_t> encoded) {
+    Troubles troubles;
+    Input input{encoded};
+    const Handle tiff = openForReading(input, troubles);
+    if (!tiff) {
+        return std::nullopt;
+    }
+    const Extent extent = extentOf(tiff.get());
+    if (!isPlausible(tiff.get(), extent, encoded.size())) {
+        return std::nullopt;
+    }
+    return EncodedImageInfo{extent.width, extent.height, memoryToDecode(tiff.get(), extent, encoded.size())};
+}
+
 std::optional<Image> decodeTIFF(std::span<const std::uint8_t> encoded) {
     Troubles troubles;
     Input input{encoded};
@@ -305,9 +350,9 @@ std::optional<Image> decodeTIFF(std::span<const std::uint8_t> encoded) {
     if (!tiff) {
         return std::nullopt;
     }
-    const auto width = field<std::uint32_t>(tiff.get(), TIFFTAG_IMAGEWIDTH);
-    const auto height = field<std::uint32_t>(tiff.get(), TIFFTAG_IMAGELENGTH);
-    if (!isImageSizeAllowed(width, height) || !isPlausible(tiff.get(), height, encoded.size())) {
+    const Extent extent = extentOf(tiff.get());
+    const auto [width, height] = extent;
+    if (!isPlausible(tiff.get(), extent, encoded.size())) {
         return std::nullopt;
     }
     const bool premultiplied = markAlphaAsPremultiplied(tiff.get());

@@ -18,6 +18,9 @@ namespace ZULMetaData {
 /// alpha, which could only be read without it.
 std::optional<Image> decodeTIFF(std::span<const std::uint8_t> encoded);
 
+/// By its directory; nothing where `decodeTIFF` would refuse it at once.
+std::optional<EncodedImageInfo> readTIFFInfo(std::span<const std::uint8_t> encoded);
+
 /// Little-endian, one uncompressed strip of RGBA with straight alpha. Empty where the image cannot be encoded.
 std::vector<std::uint8_t> encodeTIFF(const Image& image);
 

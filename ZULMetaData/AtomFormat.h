@@ -25,6 +25,10 @@ inline constexpr std::uint32_t s_metaDataAtom = fourCC("ZULM");
 inline constexpr std::uint32_t s_streamAtom = fourCC("DATA");
 inline constexpr std::uint32_t s_recordingInfoAtom = fourCC("ZULR");
 inline constexpr std::uint32_t s_spareAtom = fourCC("wide");
+inline constexpr std::uint32_t s_freeAtom = fourCC("free");
+
+/// A chunk whose data nobody reads.
+inline constexpr std::uint32_t s_junkChunk = fourCC("JUNK");
 
 /// Chunk types are compared as they are stored.
 constexpr std::uint32_t chunkType(std::uint32_t code) {
@@ -54,6 +58,22 @@ inline std::array<char, s_extendedAtomHeaderSize> extendedAtomHeader(std::uint32
     std::array<char, s_extendedAtomHeaderSize> bytes;
     std::memcpy(bytes.data(), sizeAndType.data(), sizeof sizeAndType);
     std::memcpy(bytes.data() + s_extendedSizeOffset, &extendedSize, sizeof extendedSize);
+    return bytes;
+}
+
+/// The header in its short form.
+inline std::array<char, s_atomHeaderSize> atomHeader(std::uint32_t type, std::uint32_t size) {
+    const std::array<std::uint32_t, 2> sizeAndType{swapInt(size), swapInt(type)};
+    std::array<char, s_atomHeaderSize> bytes;
+    std::memcpy(bytes.data(), sizeAndType.data(), sizeof sizeAndType);
+    return bytes;
+}
+
+/// `size` counts the data alone.
+inline std::array<char, s_chunkHeaderSize> chunkHeader(std::uint32_t type, std::uint32_t size) {
+    const std::array<std::uint32_t, 2> typeAndSize{chunkType(type), size};
+    std::array<char, s_chunkHeaderSize> bytes;
+    std::memcpy(bytes.data(), typeAndSize.data(), sizeof typeAndSize);
     return bytes;
 }
 

@@ -30,7 +30,7 @@ detail::PositionedInput inputAt(std::istream& stream, std::uint64_t position, st
 bool readAtom(detail::PositionedInput& input, ContainerItem& atom) {
     std::uint32_t type = 0;
     atom.offset = input.position();
-    if (!input.readAtomSizeAndType(atom.size, type))
+    if (!input.readAtomHeader(atom.sizeField, atom.size, type))
         return false;
     atom.type = fourCharacters(swapInt(type));
     atom.headerSize = input.position() - atom.offset;
@@ -46,6 +46,7 @@ bool readChunk(detail::PositionedInput& input, ContainerItem& chunk) {
     chunk.type = fourCharacters(type);
     chunk.headerSize = detail::s_chunkHeaderSize;
     chunk.size = chunk.headerSize + size;
+    chunk.sizeField = size;
     return true;
 }
 
@@ -66,6 +67,22 @@ std::vector<ContainerItem> listItems(detail::PositionedInput input, std::uint64_
 }
 
 } // namespace
+
+bool ContainerItem::isExtended() const {
+    return headerSize == detail::s_extendedAtomHeaderSize;
+}
+
+bool ContainerItem::holdsMetaData() const {
+    return type == fourCharacters(swapInt(detail::s_metaDataAtom));
+}
+
+bool ContainerItem::holdsStream() const {
+    return type == fourCharacters(swapInt(detail::s_streamAtom));
+}
+
+bool ContainerItem::holdsRecordingInfo() const {
+    return type == fourCharacters(swapInt(detail::s_recordingInfoAtom));
+}
 
 std::vector<ContainerItem> listAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end,
                                      std::uint64_t total) {

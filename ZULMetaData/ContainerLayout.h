@@ -18,6 +18,15 @@ struct ContainerItem {
     std::uint64_t headerSize; ///< 8, or 16 for an atom in extended form
     std::uint64_t size;       ///< of the whole item, header included, pad byte excluded. As declared: 0 is an open end
 
+    /// The 32-bit number in the header. 0 in an atom that others take to reach to the end of the file; the search for
+    /// metadata reads a 64-bit size behind every number below 8, which is then `size`.
+    std::uint32_t sizeField = 0;
+
+    bool isExtended() const;    ///< its size stands in 64 bits behind its type
+    bool holdsMetaData() const; ///< by its type; at the top of a container it is the one whose children are streams
+    bool holdsStream() const;   ///< by its type
+    bool holdsRecordingInfo() const; ///< by its type; at the top of a movie
+
     std::uint64_t payloadOffset() const { return offset + headerSize; }
     std::uint64_t end() const { return offset + size; }
 

@@ -23,26 +23,19 @@ std::string extensionOf(const std::string& path) {
 
 class MetaDataFileParser final : public MetaDataParser {
 public:
-    explicit MetaDataFileParser(const std::string& path) : path_(path), extension_(extensionOf(path)) {
+    explicit MetaDataFileParser(const std::string& path) : path_(path), type_(streamTypeOf(path)) {
         fileOpen(file_, path_.c_str(), std::ios_base::in | std::ios_base::binary);
     }
 
     bool isOpen() const { return file_.is_open(); }
 
-    StreamType getStreamType() const override {
-        if (extension_ == ".avi" || extension_ == ".wav")
-            return Riff;
-        if (extension_ == ".zcap" || extension_ == ".mp4" || extension_ == ".mov")
-            return QuickTime;
-        return extension_ == ".dat" ? RawStream : Unknown;
-    }
-
+    StreamType getStreamType() const override { return type_; }
     std::istream& getStream() override { return file_; }
     void close() override { file_.close(); }
 
 private:
     std::string path_;
-    std::string extension_;
+    StreamType type_;
     std::ifstream file_;
 };
 
@@ -60,6 +53,15 @@ private:
 };
 
 } // namespace
+
+MetaDataParser::StreamType MetaDataParser::streamTypeOf(const std::string& path) {
+    const std::string extension = extensionOf(path);
+    if (extension == ".avi" || extension == ".wav")
+        return Riff;
+    if (extension == ".zcap" || extension == ".mp4" || extension == ".mov")
+        return QuickTime;
+    return extension == ".dat" ? RawStream : Unknown;
+}
 
 std::unique_ptr<MetaDataParser> MetaDataParser::create(const std::string& path) {
     auto parser = std::make_unique<MetaDataFileParser>(path);

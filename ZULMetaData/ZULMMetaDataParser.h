@@ -33,6 +33,9 @@ public:
     /// .dat, in any case. Null for any other, and for a file that cannot be opened (one line on standard error).
     static std::unique_ptr<MetaDataParser> create(const std::string& path);
 
+    /// The container that the extension of `path` tells, without a look at the file.
+    static StreamType streamTypeOf(const std::string& path);
+
     /// Reads from a stream of the caller, which must outlive the parser and is never closed. Null where its state
     /// is not good (one line on standard error) or the type is `Unknown`.
     static std::unique_ptr<MetaDataParser> create(std::istream& stream, StreamType type);

@@ -3,9 +3,9 @@
 # Does nothing where it is there already.
 set -euo pipefail
 
-build=(g++ cmake ninja-build ccache libpng-dev libtiff-dev libcli11-dev nlohmann-json3-dev libfmt-dev)
+build=(g++ cmake ninja-build ccache libpng-dev libtiff-dev libcli11-dev nlohmann-json3-dev libfmt-dev libre2-dev)
 media=(ffmpeg)
-test=(libgtest-dev libgmock-dev imagemagick pngcheck libimage-exiftool-perl mediainfo)
+test=(libgtest-dev libgmock-dev imagemagick pngcheck libimage-exiftool-perl mediainfo groff-base python3-jsonschema zsh fish)
 check=(clang clang-format git)
 
 packages=()

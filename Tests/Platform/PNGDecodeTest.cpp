@@ -177,7 +177,7 @@ TEST(PNGDecode, FilesOfAnotherEncoderShowTheSamePixels) {
         {translucent + "-colorspace gray -define png:color-type=4 -define png:bit-depth=16", "a.png"},
     };
     for (const auto& [arguments, name] : recipes) {
-        SCOPED_TRACE(arguments + " " + name);
+        SCOPED_TRACE(testing::Message() << arguments << ' ' << name);
         expectSameAsElsewhere(encodedElsewhere(arguments, name), "a.png");
     }
 }

@@ -223,7 +223,7 @@ TEST(TIFFDecode, FilesOfAnotherEncoderShowTheSamePixels) {
         {straight + "-colorspace gray -depth 8 -compress Zip", "a.tif"},
     };
     for (const auto& [arguments, name] : recipes) {
-        SCOPED_TRACE(arguments + " " + name);
+        SCOPED_TRACE(testing::Message() << arguments << ' ' << name);
         expectSameAsElsewhere(encodedElsewhere(arguments, name), "a.tif");
     }
 }
@@ -254,14 +254,10 @@ TEST(TIFFDecode, PhotographicCompressionIsReadLikeElsewhere) {
 TEST(TIFFDecode, LargePicturesOfOneColourAreNotTakenForHostileOnes) {
     for (const std::string options :
          {"-compress RLE", "-compress LZW", "-compress Zip", "-compress JPEG -quality 50"}) {
-        for (const std::string picture : {"xc:red", "xc:gray50 -colorspace gray", "xc:white -monochrome"}) {
-            SCOPED_TRACE(options + " " + picture);
-            if (options.find("JPEG") == std::string::npos || picture.find("monochrome") == std::string::npos) {
-                const auto tiff = encodedElsewhere("-size 3000x3000 " + picture + " -define tiff:rows-per-strip=3000 " +
-                                                       "-define tiff:predictor=1 " + options,
-                                                   "a.tif");
-                EXPECT_FALSE(givesNoImage(tiff));
-            }
+        for (const std::string picture : {"xc:red", "xc:gray50 -colorspace gray"}) {
+            SCOPED_TRACE(testing::Message() << options << ' ' << picture);
+            const auto inOneStrip = "-size 3000x3000 " + picture + " -depth 8 -define tiff:rows-per-strip=3000 ";
+            EXPECT_FALSE(givesNoImage(encodedElsewhere(inOneStrip + options, "a.tif")));
         }
     }
 }

@@ -1,0 +1,3 @@
+zulm_add_test(SharedDependencies/CreatorAttributesTest)
+zulm_add_test(SharedDependencies/EndianFileTest)
+zulm_add_test(SharedDependencies/ZCAPHeaderTest)

@@ -20,6 +20,11 @@ inline const std::string s_cursorLocations = "2b7b6af2";
 inline const std::string s_scaleFactors = "2b7b6afb";
 inline const std::string s_appNames = "2b7b6a06";
 
+/// What is left of 64 bits that went below 0.
+constexpr std::uint64_t minus(std::uint64_t value) {
+    return 0 - value;
+}
+
 inline uuid kind(const std::string& group) {
     uuid type;
     const std::string bytes = hex(group + "7a1f 11e2 83d0 0017f200be7f");
@@ -136,14 +141,14 @@ inline const std::vector<std::uint64_t> s_hostileSizes = {
     0x7fffffffffffffff,
     0x8000000000000000,
     0x8000000000000001,
-    0xffffffffffffffff - 63,
-    0xffffffffffffffff - 45,
-    0xffffffffffffffff - 30,
-    0xffffffffffffffff - 29,
-    0xffffffffffffffff - 28,
-    0xffffffffffffffff - 15,
-    0xffffffffffffffff - 7,
-    0xffffffffffffffff,
+    minus(64),
+    minus(46),
+    minus(31),
+    minus(30),
+    minus(29),
+    minus(16),
+    minus(8),
+    minus(1),
 };
 
 } // namespace ZULMetaData::Test

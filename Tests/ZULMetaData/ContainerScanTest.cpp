@@ -29,8 +29,6 @@ using testing::IsEmpty;
 constexpr const char* s_foreignAtom = "Found a non DATA atom mixed in the ZUL meta data\n";
 constexpr const char* s_foreignChunk = "Found a non DATA chunk mixed in the ZUL meta data\n";
 
-constexpr std::uint64_t s_wrapped = 0; // minus something: a length that went below 0
-
 class ContainerScan : public testing::Test {
 protected:
     /// The same from a file and from a stream. `messages` then holds what was written on standard error.
@@ -248,7 +246,7 @@ TEST_F(ContainerScan, NeedsTheWholeHeaderOfAStream) {
 TEST_F(ContainerScan, LetsTheLengthOfAStreamAtomSmallerThanItsHeaderWrapAround) {
     for (std::uint64_t size = 9; size < 16; ++size) {
         const auto found = foundInMovie(extendedHeader("ZULM", 72) + extendedHeader("DATA", size) + locationStream());
-        EXPECT_THAT(found, testing::Contains(FoundStream{locations, 32, s_wrapped - (16 - size)})) << size;
+        EXPECT_THAT(found, testing::Contains(FoundStream{locations, 32, minus(16 - size)})) << size;
     }
 }
 
@@ -566,21 +564,21 @@ INSTANTIATE_TEST_SUITE_P(EverySizeField, HostileSize, testing::ValuesIn(s_sizeFi
 TEST_F(ContainerScan, AnEndThatWrapsAroundEndsTheScan) {
     const std::string found = zulmAtom({appNameStream()}); // 88 bytes
     for (std::uint64_t end = 0; end <= 88; ++end)
-        EXPECT_THAT(foundInMovie(found + extendedHeader("mdat", s_wrapped - 88 + end) + zulmAtom({locationStream()})),
+        EXPECT_THAT(foundInMovie(found + extendedHeader("mdat", minus(88 - end)) + zulmAtom({locationStream()})),
                     ElementsAre(FoundStream{appNames, 32, 56}))
             << end;
 }
 
 TEST_F(ContainerScan, AChildEndThatWrapsAroundEndsTheWalkOfItsMetaDataAtomOnly) {
-    const std::string children = extendedHeader("free", s_wrapped - 16) + extendedAtom("DATA", locationStream());
+    const std::string children = extendedHeader("free", minus(16)) + extendedAtom("DATA", locationStream());
     EXPECT_THAT(foundInMovie(extendedAtom("ZULM", children) + zulmAtom({appNameStream()})),
                 ElementsAre(FoundStream{appNames, 136, 56}));
     EXPECT_EQ(messages, s_foreignAtom);
 }
 
 TEST_F(ContainerScan, KeepsAStreamWhoseEndWrapsAround) {
-    const std::string children = extendedHeader("DATA", s_wrapped - 16) + locationStream();
-    EXPECT_THAT(foundInMovie(extendedAtom("ZULM", children)), ElementsAre(FoundStream{locations, 32, s_wrapped - 32}));
+    const std::string children = extendedHeader("DATA", minus(16)) + locationStream();
+    EXPECT_THAT(foundInMovie(extendedAtom("ZULM", children)), ElementsAre(FoundStream{locations, 32, minus(32)}));
 }
 
 } // namespace

@@ -1,0 +1,7 @@
+zulm_add_test(ZULMetaData/CursorImageRecordTest)
+zulm_add_test(ZULMetaData/CursorImageSchemaTest)
+zulm_add_test(ZULMetaData/ValueTypesTest)
+zulm_add_test(ZULMetaData/ZULMMetaDataCommonTest)
+zulm_add_test(ZULMetaData/ZULMMetaDataReaderTest)
+zulm_add_test(ZULMetaData/ZULMMetaDataUUIDsTest)
+zulm_add_test(ZULMetaData/ZULMMetaDataWriterTest)

@@ -4,6 +4,8 @@
 
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
+#include <cstddef>
+#include <cstdint>
 #include <cstdio>
 #include <memory>
 #include <string>

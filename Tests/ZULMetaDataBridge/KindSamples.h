@@ -7,6 +7,7 @@
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
 #include <cstddef>
+#include <cstdint>
 #include <string>
 #include <string_view>
 #include <tuple>
@@ -368,9 +369,9 @@ struct TopmostAppNameSamples
              },
              hex("0e000000 000000000000d03f 45 64 69 74 6f 72"), "name = text 'Editor', timestamp = float 0.25"},
             {[](Writer& writer) {
-                 writer.write("Mail", {3, 2});
+                 writer.write("Game", {3, 2});
              },
-             hex("0c000000 000000000000f83f 4d 61 69 6c"), "name = text 'Mail', timestamp = float 1.5"},
+             hex("0c000000 000000000000f83f 47 61 6d 65"), "name = text 'Game', timestamp = float 1.5"},
         };
     }
 };
@@ -444,6 +445,14 @@ using EveryKind = std::tuple<CursorActionSamples, CursorImageSamples, CursorLoca
                              SlideInfoTextSamples, SlideInfoCommentSamples, ScaleFactorSamples, SystemDataSamples,
                              ScrollActionSamples, TopmostAppNameSamples, TopmostWindowTitleSamples, CPUUsageSamples,
                              HoverRectSamples>;
+
+/// For the names of tests that run for several kinds.
+struct KindName {
+    template <class S>
+    static std::string GetName(int) {
+        return std::string(S::name);
+    }
+};
 
 template <class S>
 std::string goldenStream() {

@@ -10,9 +10,11 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <array>
+#include <cstddef>
 #include <functional>
+#include <memory>
 #include <set>
+#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <tuple>
@@ -176,13 +178,6 @@ struct AsTypes<std::tuple<Samples...>> {
     using Types = testing::Types<Samples...>;
 };
 
-struct KindName {
-    template <class S>
-    static std::string GetName(int) {
-        return std::string(S::name);
-    }
-};
-
 TYPED_TEST_SUITE(RecordedKind, AsTypes<EveryKind>::Types, KindName);
 
 TYPED_TEST(RecordedKind, HasTheNameThatItIsRegisteredUnder) {
@@ -227,26 +222,20 @@ TYPED_TEST(RecordedKind, IsReadFromARiffFile) {
     EXPECT_EQ(this->entriesOf(movie), goldenEntries<TypeParam>());
 }
 
-TYPED_TEST(RecordedKind, IsReadBackAsItWasRecorded) {
-    typename TestFixture::Writer writer(this->file);
-    recordSamples<TypeParam>(writer);
-    finish(writer);
-    const FileLocation movie = this->fileOf("Movie.mp4", movieAround(recordedStream<TypeParam>()));
-    EXPECT_EQ(this->entriesOf(this->file).size(), TypeParam::samples().size());
-    EXPECT_EQ(this->entriesOf(this->file), this->entriesOf(movie));
-}
-
 TYPED_TEST(RecordedKind, GivesAnEmptyListThatTheParserKeepsWhereTheFileHasNoSuchStream) {
+    testing::internal::CaptureStdout();
+    testing::internal::CaptureStderr();
     for (const FileLocation& location :
          {this->fileOf("Movie.mp4", atom("ftyp", "isom")), this->fileOf("Other.dat", neighbour()),
           this->fileOf("Other.avi", chunk("ZULM", chunk("DATA", neighbour()))),
           this->fileOf("Header.dat", TypeParam::header()), this->fileOf("Empty.dat", "")}) {
         typename TestFixture::Parser parser(location);
         const auto entries = parser.read();
-        ASSERT_TRUE(entries) << location;
-        EXPECT_THAT(*entries, IsEmpty()) << location;
+        EXPECT_TRUE(entries && entries->empty()) << location;
         EXPECT_EQ(this->keptList(parser), entries) << location;
     }
+    EXPECT_EQ(testing::internal::GetCapturedStdout(), "");
+    EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
 }
 
 TYPED_TEST(RecordedKind, GivesANewEqualListAtEveryRead) {
@@ -268,23 +257,23 @@ TYPED_TEST(RecordedKind, LetsTheApplicationReplaceTheKeptList) {
 }
 
 TYPED_TEST(RecordedKind, GivesTheEntriesInFrontOfACutAnywhereInAStreamFile) {
-    const std::string stream = goldenStream<TypeParam>();
+    const FileLocation stream = this->goldenFile();
     testing::internal::CaptureStdout(); // a cut header is refused with a message
-    for (std::size_t size = 0; size <= stream.size(); ++size) {
-        SCOPED_TRACE(std::to_string(size) + " of " + std::to_string(stream.size()) + " bytes");
-        this->expectRemains(this->fileOf("Cut.dat", stream.substr(0, size)), size);
+    for (std::size_t size = goldenStream<TypeParam>().size() + 1; size-- > 0;) {
+        SCOPED_TRACE("cut to " + std::to_string(size) + " bytes");
+        resize_file(stream, size);
+        this->expectRemains(stream, size);
     }
     testing::internal::GetCapturedStdout();
 }
 
 TYPED_TEST(RecordedKind, GivesTheEntriesInFrontOfACutAnywhereInAMovie) {
-    const std::string stream = goldenStream<TypeParam>();
-    const std::string movie = movieAround(stream);
-    for (std::size_t size = 0; size <= movie.size(); ++size) {
-        SCOPED_TRACE(std::to_string(size) + " of " + std::to_string(movie.size()) + " bytes");
-        const std::size_t cutOff = movie.size() - size;
-        this->expectRemains(this->fileOf("Cut.mp4", movie.substr(0, size)),
-                            stream.size() - std::min(stream.size(), cutOff));
+    const FileLocation movie = this->fileOf("Movie.mp4", movieAround(goldenStream<TypeParam>()));
+    const std::size_t streamAt = movieAround("").size();
+    for (std::size_t size = streamAt + goldenStream<TypeParam>().size() + 1; size-- > 0;) {
+        SCOPED_TRACE("cut to " + std::to_string(size) + " bytes");
+        resize_file(movie, size);
+        this->expectRemains(movie, size - std::min(size, streamAt));
     }
 }
 

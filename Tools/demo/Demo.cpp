@@ -13,6 +13,8 @@ namespace ZULMetaData::Demo {
 
 namespace {
 
+using Print = std::function<void(std::string_view)>;
+
 constexpr auto s_creatorVersion = "1.0";
 
 bool equal(const EntryValue& left, const EntryValue& right) {
@@ -48,37 +50,37 @@ std::string timeOf(const EntryDictionary& entry) {
     return fmt::format("{:.3f}", entry.get<float>("timestamp"));
 }
 
-bool check(const Track& track, const FileLocation& movie) {
+bool check(const Track& track, const FileLocation& movie, const Print& print) {
     const std::shared_ptr<EntryList> list = track.read(movie);
     const bool same = equal(*list, track.expected);
-    fmt::print("  {:<21} {:>7} {:>9} {:>9} {:>9}   {}\n", track.kind, list->size(),
-               list->empty() ? "-" : timeOf(list->front()), list->empty() ? "-" : timeOf(list->back()),
-               std::filesystem::file_size(track.file), same ? "as recorded" : "DIFFERENT");
+    print(fmt::format("  {:<21} {:>7} {:>9} {:>9} {:>9}   {}\n", track.kind, list->size(),
+                      list->empty() ? "-" : timeOf(list->front()), list->empty() ? "-" : timeOf(list->back()),
+                      std::filesystem::file_size(track.file), same ? "as recorded" : "DIFFERENT"));
     return same;
 }
 
-bool checkStamp(const FileLocation& movie) {
+bool checkStamp(const FileLocation& movie, const Print& print) {
     const auto parser = MetaDataParser::create(utf8Path(movie));
     const auto infos = parser ? readRecordingInfo(*parser) : std::vector<ZCAPHeader>();
     if (infos.size() != 1)
         return false;
     const CreatorAttributes& creator = infos.front().creator;
-    fmt::print("  stamped by {} {}, platform version {}\n", creator.name(), creator.version(),
-               creator.platformVersion());
+    print(fmt::format("  stamped by {} {}, platform version {}\n", creator.name(), creator.version(),
+                      creator.platformVersion()));
     return creator.name() == CreatorAttributes::platformNameMac() && creator.version() == s_creatorVersion;
 }
 
 } // namespace
 
-bool runDemo(const FileLocation& folder, const FileLocation& movie) {
+bool runDemo(const FileLocation& folder, const FileLocation& movie, const Print& print) {
     std::filesystem::create_directories(folder);
     const std::vector<Track> tracks = recordSession(folder);
     attach(tracks, movie);
-    fmt::print("  {:<21} {:>7} {:>9} {:>9} {:>9}\n", "kind", "entries", "first s", "last s", "bytes");
+    print(fmt::format("  {:<21} {:>7} {:>9} {:>9} {:>9}\n", "kind", "entries", "first s", "last s", "bytes"));
     bool allSame = true;
     for (const Track& track : tracks)
-        allSame &= check(track, movie);
-    return checkStamp(movie) && allSame;
+        allSame &= check(track, movie, print);
+    return checkStamp(movie, print) && allSame;
 }
 
 } // namespace ZULMetaData::Demo

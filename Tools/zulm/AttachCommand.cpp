@@ -1,66 +1,203 @@
-#include "Tools/zulm/Command.h"
 #include "Tools/zulm/Recording.h"
+#include "Tools/zulm/Report.h"
+#include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/StandardStreams.h"
 
 #include <fmt/core.h>
 
+#include <algorithm>
 #include <set>
 
 namespace Zulm {
 
 using namespace ZULMetaData;
+using Json = nlohmann::ordered_json;
 
 namespace {
 
+/// The lengths from here on come from atoms that declare less than their own header.
+constexpr std::uint64_t s_negativeLength = std::uint64_t(1) << 63;
+
 struct AttachOptions {
-    std::string movie;
+    SaveOptions save;
     std::vector<std::string> streams;
+    std::string from;
+    bool replace = false;
+    bool json = false;
+};
+
+/// What is to be attached, and whether something of it is lost already.
+struct Streams {
+    std::vector<StreamSource> sources;
+    std::set<uuid> types; ///< of the stream files
+    ExitCode code = ExitFine;
 };
 
 uuid typeOfStreamFile(const std::string& path) {
-    Recording stream(path);
-    if (stream.parser().getStreamType() != MetaDataParser::RawStream)
-        throw Failure(fmt::format("{}: not a stream file (.dat)", path));
-    const auto size = stream.parser().fileDataForUUID(stream.parser().getAvailableMetaDataUUIDs().front()).length;
-    if (size < s_metaDataHeaderSize)
-        throw Failure(
-            fmt::format("{}: too short for a stream: {} bytes of a {}-byte header", path, size, s_metaDataHeaderSize));
-    return stream.parser().getAvailableMetaDataUUIDs().front();
+    requireFile(path);
+    if (MetaDataParser::streamTypeOf(path) == MetaDataParser::RawStream)
+        return Recording(path).parser().getAvailableMetaDataUUIDs().front();
+    throw Failure(
+        fmt::format("{}: not a stream file (.dat); '--from {}' carries the streams of a recording over", path, path));
 }
 
-/// So that nothing is found out only when the movie has been changed already.
-std::set<uuid> checkStreams(const AttachOptions& options) {
-    std::set<uuid> types;
-    for (const std::string& path : options.streams)
-        if (const uuid type = typeOfStreamFile(path); !types.insert(type).second)
-            throw Failure(fmt::format("{}: a second stream {}", path, nameOf(type)));
-    return types;
+void takeStreamFiles(const AttachOptions& options, Streams& streams) {
+    for (const std::string& path : options.streams) {
+        const uuid type = typeOfStreamFile(path);
+        if (!findMetaDataKind(type))
+            warn(fmt::format("{}: {} is no kind that is known here; it is attached as it is", path, uuidText(type)));
+        streams.types.insert(type);
+        streams.sources.push_back(StreamSource::file(path));
+    }
+}
+
+void complainAboutOldMovie(const std::string& path, const std::string& what, Streams& streams) {
+    complain(fmt::format("{}: {}; 'zulm salvage {} -o DIR' may find more", path, what, path));
+    streams.code = ExitDamaged;
+}
+
+/// Where the children of a metadata atom or chunk do not end where it does, not all of them were found.
+bool hasUnreachableStreams(MetaDataParser& parser) {
+    std::istream& stream = parser.getStream();
+    const bool isMovie = parser.getStreamType() == MetaDataParser::QuickTime;
+    stream.clear();
+    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+    for (const ContainerItem& item : listTopLevel(stream, parser.getStreamType())) {
+        if (item.type != "ZULM")
+            continue;
+        const auto children = (isMovie ? listAtoms : listChunks)(stream, item.payloadOffset(), item.end(), total);
+        std::uint64_t end = children.empty() ? item.payloadOffset() : children.back().end();
+        if (!isMovie && !children.empty())
+            end += children.back().size % 2;
+        if (end != item.end())
+            return true;
+    }
+    return false;
+}
+
+void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
+    Recording old(options.from);
+    MetaDataParser& parser = old.parser();
+    for (const uuid& type : parser.getAvailableMetaDataUUIDs()) {
+        if (options.replace && streams.types.contains(type))
+            continue; // a stream file takes its place
+        const auto [offset, length] = parser.fileDataForUUID(type);
+        parser.getStream().clear();
+        const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(parser.getStream()));
+        if (length >= s_negativeLength) {
+            complainAboutOldMovie(
+                options.from, fmt::format("{} at offset {} lies in an atom without room for it", nameOf(type), offset),
+                streams);
+            continue;
+        }
+        if (length > total - offset)
+            complainAboutOldMovie(options.from,
+                                  fmt::format("{} at offset {} declares {} bytes, {} of which are there", nameOf(type),
+                                              offset, length, total - offset),
+                                  streams);
+        streams.sources.push_back(StreamSource::part(options.from, offset, length));
+    }
+    if (hasUnreachableStreams(parser))
+        complainAboutOldMovie(options.from, "its metadata cannot be walked to the end", streams);
+}
+
+Streams takeStreams(const AttachOptions& options) {
+    Streams streams;
+    takeStreamFiles(options, streams);
+    if (!options.from.empty())
+        takeStreamsOfOldMovie(options, streams);
+    return streams;
+}
+
+const char* cutText(StreamExtent::End end) {
+    return end == StreamExtent::EmptyEntry ? "an entry of size 0, which no reader gets past" : "an entry is cut short";
+}
+
+void print(const std::string& name, const AttachResult& attached) {
+    printRepair(name, attached.repair);
+    writeOutput(fmt::format("{}: {} stream{} attached\n", name, attached.streams.size(),
+                            attached.streams.size() == 1 ? "" : "s"));
+    for (const AttachedStream& stream : attached.streams)
+        writeOutput(fmt::format("  {:<23}  {:>9} {:<7}  {:>10} bytes\n", nameOf(stream.type), stream.entries,
+                                stream.entries == 1 ? "entry" : "entries", stream.bytes));
+}
+
+Json streamDocument(const AttachedStream& stream) {
+    const MetaDataKind* kind = findMetaDataKind(stream.type);
+    Json document{{"source", stream.name},         {"kind", kind ? Json(kind->name) : Json(nullptr)},
+                  {"uuid", uuidText(stream.type)}, {"offset", stream.offset},
+                  {"bytes", stream.bytes},         {"entries", stream.entries},
+                  {"bytes_cut", stream.bytesCut}};
+    if (stream.bytesCut > 0)
+        document["cut_because"] = cutText(stream.cutBecause);
+    return document;
+}
+
+void report(const AttachOptions& options, const std::string& name, const AttachResult& attached) {
+    Json file{{"path", options.save.movie},
+              {"output", name},
+              {"repair", repairDocument(attached.repair)},
+              {"streams", Json::array()}};
+    std::ranges::transform(attached.streams, std::back_inserter(file["streams"]), streamDocument);
+    printReport("attach", Json::array({file}));
+}
+
+ExitCode complainAboutCuts(const AttachResult& attached) {
+    ExitCode code = ExitFine;
+    for (const AttachedStream& stream : attached.streams) {
+        if (stream.bytesCut == 0)
+            continue;
+        complain(fmt::format("{}: {} left out {} byte{} from offset {} of the stream on: {}", stream.name,
+                             nameOf(stream.type), stream.bytesCut, stream.bytesCut == 1 ? "" : "s", stream.bytes,
+                             cutText(stream.cutBecause)));
+        code = ExitDamaged;
+    }
+    return code;
 }
 
 ExitCode runAttach(const AttachOptions& options) {
-    Recording movie(options.movie);
-    if (movie.parser().getStreamType() != MetaDataParser::QuickTime)
-        throw Failure(fmt::format("{}: not a movie (.mp4, .mov, .zcap)", options.movie));
-    const std::set<uuid> types = checkStreams(options);
-    if (!ZULMAtomRepair::finalizeAtomsInFile(options.movie))
-        throw Failure(fmt::format("{}: its atoms do not fill the file, so nothing that is appended could be found",
-                                  options.movie));
-    ZULMAtomWriter().writeMetaDataFiles({options.streams.begin(), options.streams.end()}, options.movie);
-    Recording saved(options.movie);
-    for (const uuid& type : types)
-        if (saved.parser().fileDataForUUID(type).length == 0)
-            throw Failure(fmt::format("{}: {} cannot be found in it again", options.movie, nameOf(type)));
-    fmt::print("{}: {} stream{} attached\n", options.movie, types.size(), types.size() == 1 ? "" : "s");
-    return ExitFine;
+    requireMovie(options.save.movie);
+    const Streams streams = takeStreams(options);
+    if (streams.sources.empty()) {
+        complain(fmt::format("{}: no recording metadata in it; nothing was written", options.from));
+        return worseOf(streams.code, ExitNoMetaData);
+    }
+    std::vector<std::string> inputs = options.streams;
+    if (!options.from.empty())
+        inputs.push_back(options.from);
+    SavedMovie movie(options.save, inputs);
+    const auto existing = options.replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse;
+    const AttachResult attached = movie.save("attaching to " + movie.name(), [&](const SafeMovieSave& save) {
+        return save.attach(streams.sources, existing);
+    });
+    if (options.json)
+        report(options, movie.name(), attached);
+    else
+        print(movie.name(), attached);
+    return worseOf(streams.code,
+                   worseOf(complainAboutLoss(movie.name(), attached.repair), complainAboutCuts(attached)));
 }
 
 } // namespace
 
 void addAttachCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<AttachOptions>();
-    CLI::App* command = app.add_subcommand("attach", "Put stream files into a movie");
-    command->add_option("MOVIE", options->movie, "The movie, which is changed")->required();
-    command->add_option("STREAM", options->streams, "Stream files (.dat)")->required();
-    command->callback([options, &chosen] { chosen = [options] { return runAttach(*options); }; });
+    CLI::App* command = app.add_subcommand("attach", "Put stream files, or another movie's streams, into a movie");
+    addSaveOptions(*command, options->save);
+    command->add_option("STREAM", options->streams, "Stream files (.dat)");
+    command->add_option("--from", options->from, "Carry all streams of this recording over")->type_name("OLDMOVIE");
+    command->add_flag("--replace", options->replace,
+                      "Attach kinds that are there already: a stream file goes before one of OLDMOVIE, and readers "
+                      "take the new one before one of MOVIE, which stays in the file unread");
+    command->add_flag("--json", options->json, "Print one JSON document");
+    command->footer("zulm attach Movie.mp4 cursorLocation.dat slideTitles.dat -o Recording.mp4\n"
+                    "zulm attach Remuxed.mp4 --from Recording.mp4 --in-place");
+    command->callback([options, &chosen] {
+        if (options->streams.empty() && options->from.empty())
+            throw CLI::RequiredError("at least one STREAM, or --from OLDMOVIE,");
+        requireDestination(options->save);
+        chosen = [options] { return runAttach(*options); };
+    });
 }
 
 } // namespace Zulm

@@ -1,5 +1,8 @@
 #include "Tools/zulm/Command.h"
 
+#include "Tools/zulm/Settings.h"
+
+#include <fmt/color.h>
 #include <fmt/core.h>
 
 #include <algorithm>
@@ -12,14 +15,48 @@
 
 namespace Zulm {
 
+namespace {
+
+/// `lead` goes in front, coloured where standard error is.
+void printLine(const std::string& lead, fmt::color color, const std::string& message) {
+    const std::string shownLead = useColor(stderr) ? fmt::format(fmt::emphasis::bold | fg(color), "{}", lead) : lead;
+    const std::string line = fmt::format("{} {}\n", shownLead, message);
+    std::fwrite(line.data(), 1, line.size(), stderr); // nobody can be told where even this fails
+}
+
+} // namespace
+
 void complain(const std::string& message) {
-    fmt::print(stderr, "zulm: {}\n", message);
+    printLine("zulm:", fmt::color::red, message);
+}
+
+void warn(const std::string& message) {
+    if (!settings().quiet)
+        printLine("zulm: warning:", fmt::color::orange, message);
+}
+
+void say(const std::string& message) {
+    if (settings().verbose)
+        printLine("zulm:", fmt::color::gray, message);
 }
 
 ExitCode worseOf(ExitCode left, ExitCode right) {
     constexpr std::array fromBestToWorst{ExitFine, ExitNoMetaData, ExitDamaged, ExitUsage, ExitFailed};
     const auto rank = [&](ExitCode code) { return std::ranges::find(fromBestToWorst, code); };
     return rank(left) < rank(right) ? right : left;
+}
+
+ExitCode forEachFile(const std::vector<std::string>& files, const std::function<ExitCode(const std::string&)>& work) {
+    ExitCode worst = ExitFine;
+    for (const std::string& file : files) {
+        try {
+            worst = worseOf(worst, work(file));
+        } catch (const Failure& failure) {
+            complain(failure.what());
+            worst = worseOf(worst, ExitFailed);
+        }
+    }
+    return worst;
 }
 
 void requireFile(const std::string& path, bool forWriting) {

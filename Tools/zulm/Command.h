@@ -7,6 +7,7 @@
 #include <functional>
 #include <stdexcept>
 #include <string>
+#include <vector>
 
 namespace Zulm {
 
@@ -18,7 +19,7 @@ enum ExitCode : int {
     ExitNoMetaData = 4, ///< readable, but without recording metadata
 };
 
-/// Why a command could not do its work, in words for a person.
+/// Why a command could not do its work, in words for a person: "FILE: what is wrong; what to do about it".
 class Failure : public std::runtime_error {
 public:
     using std::runtime_error::runtime_error;
@@ -28,15 +29,35 @@ public:
 using Action = std::function<ExitCode()>;
 
 void addInfoCommand(CLI::App& app, Action& chosen);
+void addAtomsCommand(CLI::App& app, Action& chosen);
 void addDumpCommand(CLI::App& app, Action& chosen);
+void addDiffCommand(CLI::App& app, Action& chosen);
+void addGrepCommand(CLI::App& app, Action& chosen);
+void addVerifyCommand(CLI::App& app, Action& chosen);
 void addAttachCommand(CLI::App& app, Action& chosen);
+void addRepairCommand(CLI::App& app, Action& chosen);
 void addStampCommand(CLI::App& app, Action& chosen);
+void addRedactCommand(CLI::App& app, Action& chosen);
+void addExtractCommand(CLI::App& app, Action& chosen);
+void addSalvageCommand(CLI::App& app, Action& chosen);
+void addConvertCommand(CLI::App& app, Action& chosen);
+void addDemoCommand(CLI::App& app, Action& chosen);
 
-/// One line on standard error.
+/// One line on standard error, whatever the settings.
 void complain(const std::string& message);
+
+/// The same for what a person should know though the work could be done. Not with --quiet.
+void warn(const std::string& message);
+
+/// The same for what is being done. Only with --verbose.
+void say(const std::string& message);
 
 /// The worse of two ends, for a command that works on several files.
 ExitCode worseOf(ExitCode left, ExitCode right);
+
+/// Runs `work` on one file after the other, whatever happens to the ones before. A `Failure` becomes a complaint. Gives
+/// the worst end.
+ExitCode forEachFile(const std::vector<std::string>& files, const std::function<ExitCode(const std::string&)>& work);
 
 /// Fails unless `path` is a regular file that can be opened; `forWriting` asks for that too.
 void requireFile(const std::string& path, bool forWriting = false);

@@ -1,16 +1,25 @@
+#include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/EntryFormat.h"
+#include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/OutputFile.h"
+#include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Recording.h"
+#include "Tools/zulm/Report.h"
+#include "Tools/zulm/Settings.h"
+#include "Tools/zulm/StandardStreams.h"
 
 #include <fmt/core.h>
 
+#include <algorithm>
 #include <filesystem>
-#include <fstream>
-#include <map>
+#include <memory>
+#include <optional>
 
 namespace Zulm {
 
 using namespace ZULMetaData;
+using Json = nlohmann::ordered_json;
 
 namespace {
 
@@ -18,68 +27,195 @@ struct DumpOptions {
     std::string file;
     std::vector<std::string> kinds;
     EntryFormat format = EntryFormat::Text;
+    std::optional<double> from;
+    std::optional<double> to;
     std::string imageFolder;
+    bool force = false;
+
+    bool covers(double time) const { return (!from || time >= *from) && (!to || time <= *to); }
 };
 
-/// Prints every entry of one stream as it is read.
-template <class Kind>
-class EntryPrinter final : public DataStreamObserver<typename Kind::Value> {
+/// What is between the brackets of an array that is printed as its elements come.
+class OpenArray {
 public:
-    EntryPrinter(const DumpOptions& options, std::string kind) : options_(options), kind_(std::move(kind)) {}
-
-    bool dataRead(double time, const typename Kind::Value& value) override {
-        auto entry = entryDocument<Kind>(time, value);
-        if (options_.format == EntryFormat::NDJSON)
-            entry["stream"] = kind_;
-        if (options_.format == EntryFormat::CSV && printed_ == 0)
-            fmt::print("{}\n", csvHeader(entry));
-        fmt::print("{}\n", formatted(entry, options_.format));
-        if constexpr (std::same_as<typename Kind::Value, CursorImage>)
-            writeImage(value);
-        ++printed_;
-        return true;
+    /// Prints `document` up to the end of its last member, an empty array.
+    void begin(const Json& document) {
+        const std::string text = jsonLine(document);
+        writeOutput(std::string_view(text).substr(0, text.size() - 2));
+        isEmpty_ = true;
     }
-
-    std::uint64_t printed() const { return printed_; }
+    void add(const Json& element) {
+        separate();
+        writeOutput(jsonLine(element));
+    }
+    /// In front of an element that is printed otherwise.
+    void separate() {
+        writeOutput(isEmpty_ ? "\n" : ",\n");
+        isEmpty_ = false;
+    }
+    void end() { writeOutput("]}"); }
 
 private:
-    void writeImage(const CursorImage& cursor) const {
-        if (options_.imageFolder.empty() || !cursor.imageData)
+    bool isEmpty_ = true;
+};
+
+/// Everything that one run prints, in its format.
+class Printout {
+public:
+    Printout(const DumpOptions& options, const Recording& recording) : options_(options) {
+        if (options_.format != EntryFormat::JSON)
             return;
-        const auto file = std::filesystem::path(options_.imageFolder) /
-                          fmt::format("cursor-{}-entry-{}.png", cursor.uniqueId, printed_);
-        std::ofstream stream(file, std::ios::binary);
-        stream.write(reinterpret_cast<const char*>(cursor.imageData), cursor.imageDataSize);
-        stream.close();
-        if (!stream)
-            throw Failure(fmt::format("{}: cannot be written", file.string()));
+        Json report = reportHeader("dump");
+        report["files"] = Json::array();
+        files_.begin(report);
+        files_.separate();
+        Json file = fileHeader(recording.name());
+        file["container"] = recording.container();
+        file["streams"] = Json::array();
+        streams_.begin(file);
+    }
+
+    /// `keys` are those of its entries; none where these cannot be decoded.
+    void beginStream(const StreamInfo& stream, const EntryKeys* keys, bool isOnlyOne) {
+        kind_ = nameOf(stream.type);
+        keys_ = keys;
+        if (options_.format == EntryFormat::Text && !isOnlyOne)
+            writeOutput(heading(kind_) + '\n');
+        if (options_.format == EntryFormat::CSV && keys)
+            writeOutput(fmt::format("{}stream,{}\n", hasTable_ ? "\n" : "", csvHeader(*keys)));
+        hasTable_ |= keys != nullptr;
+        if (options_.format == EntryFormat::JSON)
+            beginStreamDocument(stream);
+    }
+
+    void print(Json entry) {
+        switch (options_.format) {
+        case EntryFormat::Text: return writeOutput(textLine(entry) + '\n');
+        case EntryFormat::CSV: return writeOutput(kind_ + ',' + csvLine(entry, *keys_) + '\n');
+        case EntryFormat::JSON: return entries_.add(entry);
+        case EntryFormat::NDJSON: break;
+        }
+        Json line{{"stream", kind_}};
+        line.update(entry);
+        writeOutput(jsonLine(line) + '\n');
+    }
+
+    void endStream() {
+        if (options_.format == EntryFormat::JSON && keys_)
+            entries_.end();
+    }
+
+    void end() {
+        if (options_.format != EntryFormat::JSON)
+            return;
+        streams_.end();
+        files_.end();
+        writeOutput("\n");
+    }
+
+private:
+    void beginStreamDocument(const StreamInfo& stream) {
+        Json document{
+            {"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}, {"version", stream.version}};
+        document["entries"] = keys_ ? Json::array() : Json(nullptr);
+        if (!keys_)
+            return streams_.add(document);
+        streams_.separate();
+        entries_.begin(document);
     }
 
     const DumpOptions& options_;
     std::string kind_;
-    std::uint64_t printed_ = 0;
+    const EntryKeys* keys_ = nullptr;
+    bool hasTable_ = false;
+    OpenArray files_;
+    OpenArray streams_;
+    OpenArray entries_;
+};
+
+/// Prints the entries of one stream as they are read.
+template <class Kind>
+class EntryPrinter final : public DataStreamObserver<typename Kind::Value> {
+public:
+    EntryPrinter(const DumpOptions& options, Recording& recording, Printout& printout, const StreamInfo& stream)
+        : options_(options), recording_(recording), printout_(printout), stream_(stream) {
+        if (!isTerminal(stdout))
+            progress_.emplace("reading " + stream.kind, stream.range.length);
+    }
+
+    bool dataRead(double time, const typename Kind::Value& value) override {
+        ++read_;
+        showProgress();
+        if (!options_.covers(time))
+            return true;
+        Json entry = entryDocument<Kind>(time, value);
+        if (const std::string damage = damageOf(entry); !damage.empty() && !options_.imageFolder.empty())
+            warn(fmt::format("{}: {}, entry {}: {}; not written", recording_.name(), stream_.kind, read_, damage));
+        if constexpr (std::same_as<typename Kind::Value, CursorImage>)
+            writeImage(entry, value);
+        printout_.print(std::move(entry));
+        return true;
+    }
+
+    std::uint64_t read() const { return read_; }
+
+private:
+    /// Asking a file for its position costs a call of the system.
+    void showProgress() {
+        constexpr std::uint64_t interval = 4096;
+        if (!progress_ || read_ % interval != 0)
+            return;
+        const auto position = static_cast<std::uint64_t>(recording_.parser().getStream().tellg());
+        progress_->moveTo(std::min(position - stream_.range.offset, stream_.range.length));
+    }
+
+    void writeImage(Json& entry, const CursorImage& cursor) const {
+        if (options_.imageFolder.empty() || !entry["image"].is_object() || !damageOf(entry).empty())
+            return;
+        const std::string_view bytes(reinterpret_cast<const char*>(cursor.imageData), cursor.imageDataSize);
+        const std::string name =
+            fmt::format("cursor-{}-entry-{}{}", cursor.uniqueId, read_, isPNG(bytes) ? ".png" : ".tiff");
+        const auto file = std::filesystem::path(options_.imageFolder) / name;
+        writeWholeFile(file.string(), std::string(bytes), {recording_.path()}, options_.force);
+        entry["image"]["file"] = validText(file.string());
+        say(fmt::format("{} written", file.string()));
+    }
+
+    static bool isPNG(std::string_view bytes) { return bytes.starts_with("\x89PNG\r\n\x1a\n"); }
+
+    const DumpOptions& options_;
+    Recording& recording_;
+    Printout& printout_;
+    const StreamInfo& stream_;
+    std::optional<Progress> progress_;
+    std::uint64_t read_ = 0;
 };
 
 template <class Kind>
-ExitCode dumpStream(Recording& recording, const DumpOptions& options) {
-    const std::string kind(findMetaDataKind(Kind::type)->name);
-    EntryPrinter<Kind> printer(options, kind);
-    try {
-        recording.parser().loadDataType(Kind::type, printer, -1);
-        return ExitFine;
-    } catch (const Failure&) {
-        throw;
-    } catch (const std::exception&) { // an entry cut short, or system data that lacks texts
-        complain(fmt::format("{}: {} is damaged behind entry {}", recording.path(), kind, printer.printed()));
-        return ExitDamaged;
-    }
+ExitCode dumpEntries(Recording& recording, const DumpOptions& options, Printout& printout, const StreamInfo& stream) {
+    EntryPrinter<Kind> printer(options, recording, printout, stream);
+    recording.readEntries<typename Kind::Value>(stream, printer);
+    if (!stream.damage.empty())
+        warn(fmt::format("{}: {} {}; 'zulm verify {}' says more", recording.name(), stream.kind, stream.damage,
+                         recording.name()));
+    say(fmt::format("{}: {} entries of {} read", recording.name(), printer.read(), stream.kind));
+    return stream.damage.empty() ? ExitFine : ExitDamaged;
 }
 
-const MetaDataKind& kindNamed(const std::string& name) {
-    for (const MetaDataKind& kind : s_metaDataKinds)
-        if (kind.name == name)
-            return kind;
-    throw Failure(fmt::format("no kind of stream is called {}", name));
+ExitCode dumpStream(Recording& recording, const DumpOptions& options, Printout& printout, const StreamInfo& stream,
+                    bool isOnlyOne) {
+    ExitCode code = ExitFine;
+    const bool isDecoded = stream.isDecodable && RecordedKinds::visit(stream.type, [&]<class Kind>() {
+                               printout.beginStream(stream, &entryKeys<Kind>(), isOnlyOne);
+                               code = dumpEntries<Kind>(recording, options, printout, stream);
+                           });
+    if (!isDecoded) {
+        printout.beginStream(stream, nullptr, isOnlyOne);
+        warn(fmt::format("{}: entries of {}, version {}, cannot be decoded", recording.name(), nameOf(stream.type),
+                         stream.version));
+    }
+    printout.endStream();
+    return code;
 }
 
 std::vector<uuid> chosenTypes(const Recording& recording, const std::vector<uuid>& available,
@@ -88,53 +224,71 @@ std::vector<uuid> chosenTypes(const Recording& recording, const std::vector<uuid
         return available;
     std::vector<uuid> types;
     for (const std::string& name : options.kinds) {
-        const MetaDataKind& kind = kindNamed(name);
-        if (std::ranges::find(available, kind.type) == available.end())
-            throw Failure(fmt::format("{}: has no stream {}", recording.path(), name));
-        types.push_back(kind.type);
+        const auto kind = std::ranges::find(s_metaDataKinds, name, &MetaDataKind::name);
+        if (std::ranges::find(available, kind->type) == available.end())
+            throw Failure(fmt::format("{}: has no stream {}; 'zulm info {}' lists what it has", recording.name(), name,
+                                      recording.name()));
+        if (std::ranges::find(types, kind->type) == types.end())
+            types.push_back(kind->type);
     }
     return types;
 }
 
 ExitCode runDump(const DumpOptions& options) {
-    Recording recording(options.file);
+    const InputFile input(options.file);
+    Recording recording(input.path(), input.name());
     const std::vector<uuid> available = recording.parser().getAvailableMetaDataUUIDs();
-    if (available.empty()) {
-        complain(fmt::format("{}: has no recording metadata", options.file));
-        return ExitNoMetaData;
-    }
+    const std::vector<uuid> types = available.empty() ? available : chosenTypes(recording, available, options);
     if (!options.imageFolder.empty())
         std::filesystem::create_directories(options.imageFolder);
-    const std::vector<uuid> types = chosenTypes(recording, available, options);
-    ExitCode worst = ExitFine;
-    for (const uuid& type : types) {
-        if (options.format == EntryFormat::Text && types.size() > 1)
-            fmt::print("{}\n", nameOf(type));
-        const bool isKnown = RecordedKinds::visit(
-            type, [&]<class Kind>() { worst = worseOf(worst, dumpStream<Kind>(recording, options)); });
-        if (!isKnown)
-            complain(fmt::format("{}: entries of {} cannot be decoded", options.file, nameOf(type)));
-    }
+    Printout printout(options, recording);
+    ExitCode worst = available.empty() ? ExitNoMetaData : ExitFine;
+    for (const uuid& type : types)
+        worst = worseOf(worst, dumpStream(recording, options, printout, recording.streamInfo(type), types.size() == 1));
+    printout.end();
+    if (available.empty())
+        complain(fmt::format("{}: has no recording metadata", recording.name()));
     return worst;
+}
+
+std::string checkKind(const std::string& name) {
+    std::vector<std::string> names;
+    for (const MetaDataKind& kind : s_metaDataKinds)
+        names.emplace_back(kind.name);
+    if (std::ranges::find(names, name) != names.end())
+        return {};
+    return fmt::format("no kind of stream is called {}{}\nthe kinds are {}", name, suggestionFor(name, names),
+                       fmt::join(names, ", "));
 }
 
 } // namespace
 
 void addDumpCommand(CLI::App& app, Action& chosen) {
-    static const std::map<std::string, EntryFormat> formats{
-        {"text", EntryFormat::Text}, {"ndjson", EntryFormat::NDJSON}, {"csv", EntryFormat::CSV}};
     auto options = std::make_shared<DumpOptions>();
     CLI::App* command = app.add_subcommand("dump", "Print the entries of a file's streams");
-    command->add_option("FILE", options->file, "A movie, RIFF file or stream file")->required();
+    command->add_option("FILE", options->file, "A movie, RIFF file or stream file; - is standard input")->required();
     command->add_option("--stream", options->kinds, "Only this kind, such as cursorLocation (repeatable)")
-        ->type_name("KIND");
-    command->add_option("--format", options->format, "text, ndjson or csv")
-        ->type_name("FORMAT")
-        ->transform(CLI::CheckedTransformer(formats, CLI::ignore_case).description(""));
-    command
-        ->add_option("--images", options->imageFolder, "Write cursor images as they are stored (PNG) into this folder")
+        ->type_name("KIND")
+        ->allow_extra_args(false)
+        ->check(CLI::Validator(checkKind, ""));
+    addChoice(*command, "--format", options->format,
+              "How entries are printed. csv has one table for every stream, an empty line between them",
+              {{"text", EntryFormat::Text},
+               {"json", EntryFormat::JSON},
+               {"ndjson", EntryFormat::NDJSON},
+               {"csv", EntryFormat::CSV}});
+    addSeconds(*command, "--from", options->from, "Only entries at this time or later");
+    addSeconds(*command, "--to", options->to, "Only entries at this time or earlier");
+    command->add_option("--images", options->imageFolder, "Write cursor images into this folder, as they are stored")
         ->type_name("DIR");
-    command->callback([options, &chosen] { chosen = [options] { return runDump(*options); }; });
+    command->add_flag("--force", options->force, "Replace images that are there already");
+    command->footer("zulm dump --stream keyboardAction --from 10 --to 20 Recording.mp4\n"
+                    "zulm dump --format csv --stream cursorLocation Recording.mp4 > cursor.csv");
+    command->callback([options, &chosen] {
+        if (options->from && options->to && *options->from > *options->to)
+            throw CLI::ValidationError("--from", fmt::format("{} is later than --to {}", *options->from, *options->to));
+        chosen = [options] { return runDump(*options); };
+    });
 }
 
 } // namespace Zulm

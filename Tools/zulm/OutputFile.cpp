@@ -2,18 +2,16 @@
 
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/Progress.h"
+#include "Tools/zulm/TemporaryFile.h"
 
 #include <fmt/core.h>
 
-#include <array>
 #include <cerrno>
-#include <csignal>
-#include <cstdlib>
 #include <cstring>
 #include <fcntl.h>
 #include <filesystem>
 #include <fstream>
-#include <sys/stat.h>
+#include <system_error>
 #include <unistd.h>
 #include <utility>
 
@@ -23,49 +21,18 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// What a signal must remove: a handler can neither lock nor allocate.
-volatile std::sig_atomic_t s_hasTemporary = 0;
-std::array<char, 4096> s_temporary;
-
-extern "C" void removeTemporaryAndEnd(int signal) {
-    if (s_hasTemporary)
-        unlink(s_temporary.data());
-    std::signal(signal, SIG_DFL);
-    std::raise(signal);
-}
-
-void forgetTemporary() {
-    s_hasTemporary = 0;
-}
-
-void rememberTemporary(const std::string& path) {
-    forgetTemporary();
-    if (path.size() >= s_temporary.size())
-        return;
-    std::memcpy(s_temporary.data(), path.c_str(), path.size() + 1);
-    s_hasTemporary = 1;
-    for (const int signal : {SIGINT, SIGTERM, SIGHUP})
-        if (std::signal(signal, removeTemporaryAndEnd) == SIG_IGN)
-            std::signal(signal, SIG_IGN);
-}
-
 std::string failureText(const std::string& path, const char* what) {
     return fmt::format("{}: {}: {}", path, what, std::strerror(errno));
 }
 
-/// Creates it, readable as a new file would be.
-std::string newTemporary(const fs::path& path) {
+/// In the same folder, so that a rename can put it in place.
+std::unique_ptr<TemporaryFile> newTemporary(const fs::path& path) {
     const fs::path folder = path.has_parent_path() ? path.parent_path() : ".";
-    const std::string extension = path.extension().string();
-    std::string name = (folder / fmt::format(".{}.XXXXXX{}", path.stem().string(), extension)).string();
-    const int file = mkstemps(name.data(), static_cast<int>(extension.size()));
-    if (file < 0)
-        throw Failure(failureText(path.string(), "cannot be created"));
-    const mode_t mask = umask(0);
-    umask(mask);
-    fchmod(file, 0666 & ~mask);
-    close(file);
-    return name;
+    try {
+        return std::make_unique<TemporaryFile>(folder.string(), path.stem().string(), path.extension().string());
+    } catch (const std::system_error& error) {
+        throw Failure(fmt::format("{}: cannot be created: {}", path.string(), error.code().message()));
+    }
 }
 
 void sync(const std::string& path) {
@@ -87,19 +54,18 @@ OutputFile::OutputFile(const std::string& path, const std::vector<std::string>& 
             throw Failure(fmt::format("{}: is the input {} itself; choose another output", path, input));
     if (fs::exists(path) && !force)
         throw Failure(fmt::format("{}: exists already; --force replaces it", path));
-    temporaryPath_ = newTemporary(path);
-    rememberTemporary(temporaryPath_);
+    temporary_ = newTemporary(path);
 }
 
-OutputFile::~OutputFile() {
-    if (!committed_)
-        unlink(temporaryPath_.c_str());
-    forgetTemporary();
+OutputFile::~OutputFile() = default;
+
+const std::string& OutputFile::temporaryPath() const {
+    return temporary_->path();
 }
 
 void OutputFile::copyFrom(const std::string& source) {
     std::ifstream from(source, std::ios::binary);
-    std::ofstream to(temporaryPath_, std::ios::binary);
+    std::ofstream to(temporaryPath(), std::ios::binary);
     Progress progress("copying " + source, fs::file_size(source));
     std::vector<char> piece(1 << 20);
     while (from.read(piece.data(), static_cast<std::streamsize>(piece.size())), from.gcount() > 0) {
@@ -112,10 +78,10 @@ void OutputFile::copyFrom(const std::string& source) {
 }
 
 void OutputFile::commit() {
-    sync(temporaryPath_);
-    if (std::rename(temporaryPath_.c_str(), path_.c_str()) != 0)
+    sync(temporaryPath());
+    if (std::rename(temporaryPath().c_str(), path_.c_str()) != 0)
         throw Failure(failureText(path_, "cannot be put in place"));
-    committed_ = true;
+    temporary_->release();
     const fs::path folder = fs::path(path_).parent_path();
     sync(folder.empty() ? "." : folder.string());
 }

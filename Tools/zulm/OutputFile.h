@@ -2,10 +2,13 @@
 
 // Files that appear whole or not at all.
 
+#include <memory>
 #include <string>
 #include <vector>
 
 namespace Zulm {
+
+class TemporaryFile;
 
 /// Written beside its place under another name, then synced and renamed. What is not committed is removed, also when
 /// a signal ends the program.
@@ -18,7 +21,7 @@ public:
     OutputFile& operator=(const OutputFile&) = delete;
 
     /// Where to write: an empty file in the same folder and with the same extension, which tells containers apart.
-    const std::string& temporaryPath() const { return temporaryPath_; }
+    const std::string& temporaryPath() const;
 
     /// Fills the file with the bytes of `source`, showing progress. Throws `Failure`.
     void copyFrom(const std::string& source);
@@ -28,8 +31,7 @@ public:
 
 private:
     std::string path_;
-    std::string temporaryPath_;
-    bool committed_ = false;
+    std::unique_ptr<TemporaryFile> temporary_;
 };
 
 /// Writes `contents` as a whole file. Throws `Failure` as `OutputFile` does.

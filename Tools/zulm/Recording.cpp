@@ -4,6 +4,8 @@
 
 #include <fmt/core.h>
 
+#include <algorithm>
+#include <iostream>
 #include <sstream>
 #include <stdexcept>
 
@@ -13,47 +15,58 @@ using namespace ZULMetaData;
 
 namespace {
 
-template <class Value>
-class Summary final : public DataStreamObserver<Value> {
+/// Keeps what is printed on a stream from being seen.
+class Muted {
 public:
-    explicit Summary(StreamInfo& info) : info_(info) {}
-
-    bool dataRead(double time, const Value&) override {
-        ++info_.entries;
-        if (!info_.firstTime)
-            info_.firstTime = time;
-        info_.lastTime = time;
-        return true;
-    }
+    explicit Muted(std::ostream& stream) : stream_(stream), buffer_(stream.rdbuf(nullptr)) {}
+    ~Muted() { stream_.rdbuf(buffer_); }
+    Muted(const Muted&) = delete;
+    Muted& operator=(const Muted&) = delete;
 
 private:
-    StreamInfo& info_;
+    std::ostream& stream_;
+    std::streambuf* buffer_;
 };
 
-std::int32_t versionAt(std::istream& stream, std::uint64_t offset) {
-    MetaDataHeader header;
-    stream.clear();
-    stream.seekg(static_cast<std::streamoff>(offset));
-    stream.read(reinterpret_cast<char*>(&header), sizeof header);
-    return header.version;
+/// The first thing that is wrong, and how much else.
+std::string damageIn(const StreamReport& stream) {
+    const auto isDamage = [](const Finding& finding) { return finding.severity() == Severity::Damage; };
+    const auto first = std::ranges::find_if(stream.findings, isDamage);
+    if (first == stream.findings.end())
+        return {};
+    const auto others = std::ranges::count_if(stream.findings, isDamage) - 1;
+    return fmt::format("at offset {}: {}{}", first->offset, first->sentence,
+                       others == 0 ? std::string() : fmt::format(" ({} more)", others));
 }
 
 } // namespace
 
-Recording::Recording(std::string path) : path_(std::move(path)) {
+Recording::Recording(std::string path, std::string name) : path_(std::move(path)), name_(std::move(name)) {
+    if (name_.empty())
+        name_ = path_;
     requireFile(path_);
-    parser_ = MetaDataParser::create(path_);
+    {
+        const Muted libraryMessages(std::cerr); // they name no file; the tool says the same in its own words
+        parser_ = MetaDataParser::create(path_);
+    }
     if (!parser_)
         throw Failure(
-            fmt::format("{}: not a movie (.mp4, .mov, .zcap), a RIFF file (.avi, .wav) or a stream (.dat)", path_));
+            fmt::format("{}: not a movie (.mp4, .mov, .zcap), a RIFF file (.avi, .wav) or a stream (.dat)", name_));
+    say(fmt::format("{}: {} with {} streams", name_, container(), parser_->getAvailableMetaDataUUIDs().size()));
 }
 
 std::string Recording::container() const {
-    switch (parser_->getStreamType()) {
-    case MetaDataParser::QuickTime: return "movie";
-    case MetaDataParser::Riff: return "RIFF";
-    default: return "stream";
+    return containerName(parser_->getStreamType());
+}
+
+const ValidationReport& Recording::validation() {
+    try {
+        if (!validation_)
+            validation_ = validateRecording(path_);
+    } catch (const std::runtime_error& error) {
+        throw Failure(fmt::format("{}: {}", name_, error.what()));
     }
+    return *validation_;
 }
 
 std::vector<StreamInfo> Recording::streams() {
@@ -67,28 +80,42 @@ StreamInfo Recording::streamInfo(const uuid& type) {
     StreamInfo info;
     info.type = type;
     info.range = parser_->fileDataForUUID(type);
-    info.version = versionAt(parser_->getStream(), info.range.offset);
     const MetaDataKind* kind = findMetaDataKind(type);
-    if (!kind)
+    info.kind = kind ? kind->name : std::string_view();
+    const auto& streams = validation().streams;
+    const auto found = std::ranges::find(streams, info.range.offset, &StreamReport::offset);
+    if (found == streams.end() || found->presentBytes < s_metaDataHeaderSize) {
+        info.damage = "it could not be examined";
         return info;
-    info.kind = kind->name;
-    if (info.version < 1 || info.version > kind->currentVersion)
-        return info;
-    info.isDecodable = RecordedKinds::visit(type, [&]<class Kind>() {
-        Summary<typename Kind::Value> summary(info);
-        try {
-            parser_->loadDataType(type, summary, -1);
-        } catch (const std::runtime_error&) {
-            info.damage = fmt::format("cut short behind entry {}", info.entries);
-        }
-    });
+    }
+    info.version = found->version;
+    info.isDecodable = kind && info.version >= 1 && info.version <= kind->currentVersion &&
+                       RecordedKinds::visit(type, []<class Kind>() {});
+    info.entries = found->wholeEntries;
+    info.firstTime = found->firstTime;
+    info.lastTime = found->lastTime;
+    info.readableBytes = found->readableBytes;
+    info.damage = damageIn(*found);
     return info;
+}
+
+std::string containerName(MetaDataParser::StreamType type) {
+    switch (type) {
+    case MetaDataParser::QuickTime: return "movie";
+    case MetaDataParser::Riff: return "RIFF";
+    default: return "stream";
+    }
 }
 
 std::string uuidText(const uuid& type) {
     std::ostringstream text;
     text << type;
     return text.str();
+}
+
+nlohmann::ordered_json kindDocument(const uuid& type) {
+    const MetaDataKind* kind = findMetaDataKind(type);
+    return kind ? nlohmann::ordered_json(kind->name) : nlohmann::ordered_json(nullptr);
 }
 
 std::string nameOf(const uuid& type) {

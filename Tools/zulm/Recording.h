@@ -3,7 +3,10 @@
 // A file that holds metadata streams, opened for looking into it.
 
 #include "ZULMetaData/ZULMetaData.h"
+#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
+
+#include <nlohmann/json.hpp>
 
 #include <cstdint>
 #include <memory>
@@ -22,32 +25,51 @@ struct StreamInfo {
     std::uint64_t entries = 0;
     std::optional<double> firstTime;
     std::optional<double> lastTime;
-    std::string damage; ///< what ended the entries early, or empty
+    std::uint64_t readableBytes = 0; ///< header included: what a reader can be trusted with
+    std::string damage;              ///< the first thing that is wrong with it, or empty
 };
 
 class Recording {
 public:
-    /// Throws `Failure` for a file that cannot be opened or is no container by its name.
-    explicit Recording(std::string path);
+    /// Throws `Failure` for a file that cannot be opened or is no container by its name. `name` is what it is called
+    /// towards a person; its path where that is empty.
+    explicit Recording(std::string path, std::string name = {});
 
     const std::string& path() const { return path_; }
+    const std::string& name() const { return name_; }
     ZULMetaData::MetaDataParser& parser() { return *parser_; }
 
-    /// "movie", "RIFF" or "stream".
     std::string container() const;
 
-    /// Every stream in the file, in the order of their identifiers. Reads them through.
-    std::vector<StreamInfo> streams();
+    /// What was found by walking every byte of the metadata, once. Throws `Failure` where the file cannot be read.
+    const ZULMetaData::ValidationReport& validation();
 
-private:
+    /// Every stream that readers find, in the order of their identifiers.
+    std::vector<StreamInfo> streams();
     StreamInfo streamInfo(const ZULMetaData::uuid& type);
 
+    /// Delivers the entries of a decodable stream as far as they are whole.
+    template <class Value>
+    void readEntries(const StreamInfo& stream, ZULMetaData::DataStreamObserver<Value>& observer) {
+        ZULMetaData::MetaDataReader<Value>::parseStream(observer, parser_->getStream(), stream.range.offset,
+                                                        stream.readableBytes, -1);
+    }
+
+private:
     std::string path_;
+    std::string name_;
     std::unique_ptr<ZULMetaData::MetaDataParser> parser_;
+    std::optional<ZULMetaData::ValidationReport> validation_;
 };
+
+/// "movie", "RIFF" or "stream".
+std::string containerName(ZULMetaData::MetaDataParser::StreamType type);
 
 /// The identifier as text.
 std::string uuidText(const ZULMetaData::uuid& type);
+
+/// The name of a registered kind, else null.
+nlohmann::ordered_json kindDocument(const ZULMetaData::uuid& type);
 
 /// "cursorLocation", or the identifier of a stream that is in no registry.
 std::string nameOf(const ZULMetaData::uuid& type);

@@ -1,16 +1,39 @@
 #include "Tools/zulm/Report.h"
 
-#include <fmt/core.h>
+#include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
+
+#include <cmath>
+#include <utility>
 
 namespace Zulm {
 
-void printReport(const std::string& command, nlohmann::ordered_json files) {
-    using Json = nlohmann::ordered_json;
-    const Json report{{"schema", "zulm." + command},
-                      {"schema_version", 1},
-                      {"tool_version", ZULM_VERSION},
-                      {"files", std::move(files)}};
-    fmt::print("{}\n", report.dump(2, ' ', false, Json::error_handler_t::replace));
+using Json = nlohmann::ordered_json;
+
+Json reportHeader(const std::string& command) {
+    return {{"schema", "zulm." + command}, {"schema_version", 1}, {"tool_version", ZULM_VERSION}};
+}
+
+void printReport(const std::string& command, Json files) {
+    Json report = reportHeader(command);
+    report["files"] = std::move(files);
+    writeOutput(report.dump(2, ' ', false, Json::error_handler_t::replace) + '\n');
+}
+
+Json fileHeader(const std::string& path) {
+    const std::string valid = validText(path);
+    Json document{{"path", valid}};
+    if (valid != path)
+        document["path_base64"] = base64(path);
+    return document;
+}
+
+Json numberDocument(std::optional<double> number) {
+    if (!number || std::isfinite(*number))
+        return number ? Json(*number) : Json(nullptr);
+    if (std::isnan(*number))
+        return "NaN";
+    return *number > 0 ? "Infinity" : "-Infinity";
 }
 
 } // namespace Zulm

@@ -1,7 +1,8 @@
 #include "Tools/zulm/Settings.h"
 
+#include "Tools/zulm/Choice.h"
+
 #include <cstdlib>
-#include <map>
 #include <string_view>
 #include <unistd.h>
 
@@ -13,14 +14,11 @@ Settings& settings() {
 }
 
 void addSettings(CLI::App& app) {
-    static const std::map<std::string, ColorMode> modes{
-        {"auto", ColorMode::Auto}, {"always", ColorMode::Always}, {"never", ColorMode::Never}};
-    app.add_flag("-q,--quiet", settings().quiet, "Print no messages but errors");
-    app.add_flag("-v,--verbose", settings().verbose, "Say on standard error what is done");
+    CLI::Option* quiet = app.add_flag("-q,--quiet", settings().quiet, "Print no messages but errors");
+    app.add_flag("-v,--verbose", settings().verbose, "Say on standard error what is done")->excludes(quiet);
     app.add_flag("--no-progress", settings().noProgress, "Show no progress on a terminal");
-    app.add_option("--color", settings().color, "Colour: auto, always or never")
-        ->type_name("WHEN")
-        ->transform(CLI::CheckedTransformer(modes).description(""));
+    addChoice(app, "--color", settings().color, "Whether headings and messages are coloured (auto: on a terminal)",
+              {{"auto", ColorMode::Auto}, {"always", ColorMode::Always}, {"never", ColorMode::Never}});
 }
 
 bool isTerminal(std::FILE* stream) {

@@ -1,38 +1,58 @@
-#include "Tools/zulm/Command.h"
-#include "Tools/zulm/Recording.h"
+#include "Tools/zulm/Report.h"
+#include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/StandardStreams.h"
 
 #include <fmt/core.h>
 
 namespace Zulm {
 
 using namespace ZULMetaData;
+using Json = nlohmann::ordered_json;
 
 namespace {
 
 struct StampOptions {
-    std::string movie;
+    SaveOptions save;
     std::string creator;
     std::string version;
+    bool json = false;
 };
 
+void print(const std::string& name, const StampResult& stamped) {
+    const CreatorAttributes& creator = stamped.info.creator;
+    printRepair(name, stamped.repair);
+    writeOutput(fmt::format("{}: stamped as {} {} on version {}\n", name, creator.name(), creator.version(),
+                            creator.platformVersion()));
+}
+
+void report(const StampOptions& options, const std::string& name, const StampResult& stamped) {
+    const CreatorAttributes& creator = stamped.info.creator;
+    const Json file{
+        {"path", options.save.movie},
+        {"output", name},
+        {"repair", repairDocument(stamped.repair)},
+        {"creator",
+         {{"name", creator.name()}, {"version", creator.version()}, {"platform_version", creator.platformVersion()}}}};
+    printReport("stamp", Json::array({file}));
+}
+
+ExitCode complainAboutCut(const StampOptions& options, const CreatorAttributes& creator) {
+    if (creator.version() == options.version)
+        return ExitFine;
+    complain(fmt::format("the version was cut to what its field holds: {}", creator.version()));
+    return ExitDamaged;
+}
+
 ExitCode runStamp(const StampOptions& options) {
-    requireFile(options.movie, true);
-    if (Recording(options.movie).parser().getStreamType() != MetaDataParser::QuickTime)
-        throw Failure(fmt::format("{}: not a movie (.mp4, .mov, .zcap)", options.movie));
-    if (!ZULMAtomRepair::finalizeAtomsInFile(options.movie))
-        throw Failure(fmt::format("{}: its atoms do not fill the file, so nothing that is appended could be found",
-                                  options.movie));
-    ZULRAtomWriter().writeZULRtoFile(options.movie, options.creator, options.version);
-    Recording stamped(options.movie);
-    const auto infos = readRecordingInfo(stamped.parser());
-    if (infos.empty() || !options.version.starts_with(infos.back().creator.version()))
-        throw Failure(fmt::format("{}: the stamp cannot be found in it again", options.movie));
-    const CreatorAttributes& creator = infos.back().creator;
-    fmt::print("{}: stamped as {} {} on version {}\n", options.movie, creator.name(), creator.version(),
-               creator.platformVersion());
-    if (creator.version() != options.version)
-        complain(fmt::format("the version was cut to what its field holds: {}", creator.version()));
-    return ExitFine;
+    SavedMovie movie(options.save, {});
+    const StampResult stamped = movie.save("stamping " + movie.name(), [&](const SafeMovieSave& save) {
+        return save.stamp(options.creator, options.version);
+    });
+    if (options.json)
+        report(options, movie.name(), stamped);
+    else
+        print(movie.name(), stamped);
+    return worseOf(complainAboutLoss(movie.name(), stamped.repair), complainAboutCut(options, stamped.info.creator));
 }
 
 } // namespace
@@ -40,11 +60,21 @@ ExitCode runStamp(const StampOptions& options) {
 void addStampCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<StampOptions>();
     CLI::App* command = app.add_subcommand("stamp", "Append the recording info atom to a movie");
-    command->add_option("MOVIE", options->movie, "The movie, which is changed")->required();
-    command->add_option("--creator", options->creator, "Who made it (the platform's name is stored in its place)")
-        ->required();
-    command->add_option("--creator-version", options->version, "The version of who made it")->required();
-    command->callback([options, &chosen] { chosen = [options] { return runStamp(*options); }; });
+    addSaveOptions(*command, options->save);
+    command
+        ->add_option("--creator", options->creator,
+                     "Who made it (readers tell platforms apart by this: the platform's name is stored in its place)")
+        ->required()
+        ->type_name("NAME");
+    command->add_option("--creator-version", options->version, "The version of who made it, at most 15 bytes")
+        ->required()
+        ->type_name("V");
+    command->add_flag("--json", options->json, "Print one JSON document");
+    command->footer("zulm stamp Movie.mp4 --creator Recorder --creator-version 4.2 --in-place");
+    command->callback([options, &chosen] {
+        requireDestination(options->save);
+        chosen = [options] { return runStamp(*options); };
+    });
 }
 
 } // namespace Zulm

@@ -62,13 +62,18 @@ std::string_view upToZeroByte(std::string_view bytes) {
 } // namespace
 
 bool isUTF8(std::string_view bytes) {
-    while (!bytes.empty()) {
-        const std::size_t length = validCharacterLength(bytes);
+    return validUTF8Length(bytes) == bytes.size();
+}
+
+std::size_t validUTF8Length(std::string_view bytes) {
+    std::size_t valid = 0;
+    while (valid < bytes.size()) {
+        const std::size_t length = validCharacterLength(bytes.substr(valid));
         if (length == 0)
-            return false;
-        bytes.remove_prefix(length);
+            break;
+        valid += length;
     }
-    return true;
+    return valid;
 }
 
 std::string textFromUTF8(const std::string& bytes) {

@@ -2,12 +2,16 @@
 
 // Stored bytes as texts for the application.
 
+#include <cstddef>
 #include <string>
 #include <string_view>
 
 namespace ZULMetaData {
 
 bool isUTF8(std::string_view bytes);
+
+/// Bytes of the whole, valid characters that `bytes` begins with.
+std::size_t validUTF8Length(std::string_view bytes);
 
 /// The bytes up to the first zero byte. Throws `std::invalid_argument` where they are not UTF-8.
 std::string textFromUTF8(const std::string& bytes);

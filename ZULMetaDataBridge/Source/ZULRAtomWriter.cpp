@@ -3,7 +3,6 @@
 #include "Platform/AssertionReport.h"
 #include "Platform/ProcessInfo.h"
 #include "SharedDependencies/EndianFile.h"
-#include "SharedDependencies/ZCAPHeader.h"
 #include "ZULMetaData/AtomFormat.h"
 #include "ZULMetaData/AtomWriting.h"
 #include "ZULMetaDataBridge/Source/ZULMAtomRepair.h"
@@ -18,18 +17,6 @@ namespace {
 std::string versionOfThisSystem() {
     const auto version = ProcessInfo::current().operatingSystemVersion;
     return std::to_string(version.major) + '.' + std::to_string(version.minor) + '.' + std::to_string(version.patch);
-}
-
-ZCAPHeader recordingInfo(const std::string& creatorName, const std::string& creatorVersion) {
-    CreatorAttributes creator;
-    creator.setName(creatorName);
-    creator.setVersion(creatorVersion);
-    creator.setName(CreatorAttributes::platformNameMac());
-    creator.setPlatformVersion(versionOfThisSystem());
-    ZCAPHeader header;
-    header.headerVersion = 1;
-    header.creator = creator;
-    return header;
 }
 
 struct AppendedAtom {
@@ -58,6 +45,18 @@ void writeAtomSize(const std::string& path, const AppendedAtom& appended) {
 }
 
 } // namespace
+
+ZCAPHeader recordingInfo(const std::string& creatorName, const std::string& creatorVersion) {
+    CreatorAttributes creator;
+    creator.setName(creatorName);
+    creator.setVersion(creatorVersion);
+    creator.setName(CreatorAttributes::platformNameMac());
+    creator.setPlatformVersion(versionOfThisSystem());
+    ZCAPHeader header;
+    header.headerVersion = 1;
+    header.creator = creator;
+    return header;
+}
 
 void ZULRAtomWriter::writeZULRtoFile(const FileLocation& file, const std::string& creatorName,
                                      const std::string& creatorVersion) const {

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "Platform/FileLocation.h"
+#include "SharedDependencies/ZCAPHeader.h"
 
 #include <string>
 
@@ -16,5 +17,8 @@ public:
     void writeZULRtoFile(const FileLocation& file, const std::string& creatorName,
                          const std::string& creatorVersion) const;
 };
+
+/// What `writeZULRtoFile` stores, for the system that this program runs on.
+ZCAPHeader recordingInfo(const std::string& creatorName, const std::string& creatorVersion);
 
 } // namespace ZULMetaData

@@ -1,0 +1,320 @@
+// Putting streams into movies from the command line. Runs ffmpeg(1).
+
+#include "Tests/Support/Bytes.h"
+#include "Tests/Tools/RecordedSession.h"
+#include "Tests/Tools/ToolRun.h"
+#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "ZULMetaData/ZULMetaData.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
+
+#include <filesystem>
+#include <map>
+
+namespace ZULMetaData::Test {
+
+namespace {
+
+using testing::HasSubstr;
+using testing::IsEmpty;
+using testing::Not;
+
+class AttachCommand : public RecordedSession {
+protected:
+    void SetUp() override { writeFile(plain, tinyMovie()); }
+
+    static std::map<uuid, std::string> streamsIn(const std::string& path) {
+        std::map<uuid, std::string> streams;
+        if (const auto parser = MetaDataParser::create(path))
+            parser->loadAllData(streams);
+        return streams;
+    }
+
+    static std::string dumpOf(const std::string& path) {
+        const ToolResult result = runTool({"dump", "--format", "ndjson", path});
+        EXPECT_EQ(result.exitCode, 0) << result.errors;
+        return result.output;
+    }
+
+    std::string stream(const std::string& name, const std::string& bytes) const {
+        writeFile(folder / name, bytes);
+        return folder / name;
+    }
+
+    std::vector<std::string> namesInFolder() const {
+        std::vector<std::string> names;
+        for (const auto& entry : std::filesystem::directory_iterator(folder.path()))
+            names.push_back(entry.path().filename());
+        std::ranges::sort(names);
+        return names;
+    }
+
+    /// A movie that players play.
+    std::string realMovie(const std::string& name) const {
+        outputOf("ffmpeg -v error -f lavfi -i testsrc2=size=64x64:rate=10 -f lavfi -i sine -t 1 -c:v mpeg4 -c:a aac " +
+                 (folder / name));
+        return folder / name;
+    }
+
+    const std::string plain = folder / "Plain.mp4";
+    const std::string out = folder / "Out.mp4";
+};
+
+TEST_F(AttachCommand, WritesACopyThatHoldsEveryStream) {
+    std::vector<std::string> arguments{"attach", plain};
+    arguments.insert(arguments.end(), streamFiles().begin(), streamFiles().end());
+    arguments.insert(arguments.end(), {"-o", out});
+    const ToolResult result = runTool(arguments);
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_THAT(result.output, HasSubstr(out + ": 17 streams attached\n"));
+    EXPECT_THAT(result.output, HasSubstr("cursorLocation"));
+    EXPECT_EQ(result.errors, "");
+    EXPECT_EQ(streamsIn(out), streamsIn(movie()));
+    EXPECT_EQ(contentsOf(plain), tinyMovie());
+}
+
+TEST_F(AttachCommand, ChangesTheMovieWhereItIsToldTo) {
+    const ToolResult result = runTool({"attach", plain, streamFile("cursorLocation"), "--in-place"});
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_EQ(contentsOf(plain), tinyMovie() + zulmAtom({contentsOf(streamFile("cursorLocation"))}));
+}
+
+TEST_F(AttachCommand, WantsToKnowWhichFileIsWritten) {
+    const ToolResult neither = runTool({"attach", plain, streamFile("cursorLocation")});
+    EXPECT_EQ(neither.exitCode, 2);
+    EXPECT_THAT(neither.errors, HasSubstr("either -o OUT, which writes a changed copy, or --in-place"));
+    EXPECT_EQ(runTool({"attach", plain, streamFile("cpuUsage"), "-o", out, "--in-place"}).exitCode, 2);
+    EXPECT_EQ(runTool({"attach", plain, streamFile("cpuUsage"), "--force", "--in-place"}).exitCode, 2);
+    const ToolResult nothing = runTool({"attach", plain, "--in-place"});
+    EXPECT_EQ(nothing.exitCode, 2);
+    EXPECT_THAT(nothing.errors, HasSubstr("at least one STREAM, or --from OLDMOVIE"));
+    EXPECT_EQ(contentsOf(plain), tinyMovie());
+    EXPECT_FALSE(std::filesystem::exists(out));
+}
+
+TEST_F(AttachCommand, ReportsAsJSON) {
+    const std::string torn = stream("torn.dat", appNameStream() + "torn");
+    const std::string open = stream("Open.mp4", be32(0) + "mdat" + "0123456789");
+    const ToolResult result = runTool({"attach", open, torn, "-o", out, "--json"});
+    EXPECT_EQ(result.exitCode, 3);
+    const auto file = nlohmann::json::parse(result.output).at("files").at(0);
+    EXPECT_EQ(file.at("path"), open);
+    EXPECT_EQ(file.at("output"), out);
+    EXPECT_EQ(file.at("repair").at("changes").at(0).at("offset"), 0);
+    EXPECT_EQ(file.at("repair").at("changes").at(0).at("before"), "00000000");
+    EXPECT_EQ(file.at("repair").at("changes").at(0).at("after"), "00000012");
+    const auto attached = file.at("streams").at(0);
+    EXPECT_EQ(attached.at("kind"), "topmostAppName");
+    EXPECT_EQ(attached.at("uuid"), "2b7b6a06-7a1f-11e2-83d0-0017f200be7f");
+    EXPECT_EQ(attached.at("offset"), 18 + 32);
+    EXPECT_EQ(attached.at("bytes"), 56);
+    EXPECT_EQ(attached.at("entries"), 2);
+    EXPECT_EQ(attached.at("bytes_cut"), 4);
+    EXPECT_EQ(attached.at("cut_because"), "an entry is cut short");
+}
+
+// Loss ------------------------------------------------------------------------------------------------------------
+
+TEST_F(AttachCommand, CutsTornTailsOffAndSaysSo) {
+    const std::string torn = stream("torn.dat", locationStream() + "torn!");
+    const ToolResult result = runTool({"attach", plain, torn, streamFile("cpuUsage"), "-o", out});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.errors, HasSubstr(torn + ": cursorLocation left out 5 bytes from offset 56 of the stream on: "
+                                                "an entry is cut short"));
+    EXPECT_EQ(streamsIn(out)[kind(s_cursorLocations)], locationStream());
+    EXPECT_EQ(streamsIn(out).size(), 2U);
+    EXPECT_EQ(contentsOf(torn), locationStream() + "torn!");
+}
+
+TEST_F(AttachCommand, TakesWhatIsWholeOfHostileStreams) {
+    const std::map<std::string, std::string> hostile{
+        {"an entry of size 0", streamHeader(s_appNames, 1, 0) + le32(0) + std::string(100, '\0')},
+        {"a huge entry", streamHeader(s_appNames, 1, 0) + le32(0xffffffff) + "x"},
+        {"huge entries", streamHeader(s_appNames, 1, 0xffffffff) + "x"},
+    };
+    for (const auto& [what, bytes] : hostile) {
+        SCOPED_TRACE(what);
+        const ToolResult result = runTool({"attach", plain, stream("a.dat", bytes), "-o", out, "--force"});
+        EXPECT_EQ(result.exitCode, 3) << result.errors;
+        EXPECT_EQ(contentsOf(out), tinyMovie() + zulmAtom({bytes.substr(0, 24)}));
+    }
+}
+
+TEST_F(AttachCommand, RefusesFilesThatAreNoStreams) {
+    for (const std::size_t length : {0U, 1U, 23U}) {
+        const ToolResult result = runTool({"attach", plain, stream("a.dat", std::string(length, 'x')), "-o", out});
+        EXPECT_EQ(result.exitCode, 1);
+        EXPECT_THAT(result.errors, HasSubstr("a.dat: too short for a stream"));
+    }
+    EXPECT_THAT(runTool({"attach", plain, movie(), "-o", out}).errors, HasSubstr("'--from " + movie() + "'"));
+    EXPECT_EQ(runTool({"attach", plain, folder / "missing.dat", "-o", out}).exitCode, 1);
+    EXPECT_EQ(runTool({"attach", plain, folder.path(), "-o", out}).exitCode, 1);
+    EXPECT_FALSE(std::filesystem::exists(out));
+}
+
+TEST_F(AttachCommand, WarnsOfAKindThatNobodyKnows) {
+    const std::string unknown = stream("a.dat", std::string(16, 'u') + le32(1) + le32(4) + "data");
+    const ToolResult result = runTool({"attach", plain, unknown, "-o", out});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_THAT(result.errors, HasSubstr("75757575-7575-7575-7575-757575757575 is no kind that is known here"));
+    EXPECT_EQ(streamsIn(out).size(), 1U);
+}
+
+TEST_F(AttachCommand, RefusesASecondStreamOfAKindUnlessItMayReplace) {
+    const std::string newer = stream("newer.dat", locationStream());
+    const std::string both = copyOf(movie());
+    const ToolResult result = runTool({"attach", both, newer, "--in-place"});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("has a stream of the kind cursorLocation already"));
+    EXPECT_THAT(result.errors, HasSubstr("--replace"));
+    EXPECT_EQ(contentsOf(both), contentsOf(movie()));
+    EXPECT_EQ(runTool({"attach", both, newer, "--in-place", "--replace"}).exitCode, 0);
+    EXPECT_EQ(streamsIn(both)[kind(s_cursorLocations)], locationStream());
+    EXPECT_EQ(streamsIn(both).size(), 17U);
+    const ToolResult twice = runTool({"attach", plain, newer, streamFile("cursorLocation"), "--in-place", "--replace"});
+    EXPECT_EQ(twice.exitCode, 1);
+    EXPECT_THAT(twice.errors, HasSubstr("a second stream of the kind cursorLocation"));
+}
+
+// From another movie ----------------------------------------------------------------------------------------------
+
+TEST_F(AttachCommand, BringsBackWhatARemuxDrops) {
+    const std::string recording = realMovie("Recording.mp4");
+    ASSERT_EQ(runTool({"attach", recording, "--from", movie(), "--in-place"}).exitCode, 0);
+    ASSERT_EQ(streamsIn(recording).size(), 17U);
+    const std::string remuxed = folder / "Remuxed.mp4";
+    outputOf("ffmpeg -v error -i " + recording + " -map 0 -c copy " + remuxed);
+    EXPECT_THAT(streamsIn(remuxed), IsEmpty()) << "a remux drops atoms that it does not know";
+    const ToolResult result = runTool({"attach", remuxed, "--from", recording, "-o", out});
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_EQ(dumpOf(out), dumpOf(recording));
+    EXPECT_THAT(dumpOf(out), Not(IsEmpty()));
+    const std::string packets = "ffmpeg -v error -map 0 -c copy -f streamhash - -i ";
+    EXPECT_EQ(outputOf(packets + out), outputOf(packets + recording));
+}
+
+TEST_F(AttachCommand, CarriesStreamsOverFromRIFF) {
+    const std::string riff = stream("old.avi", riffMedia() + zulmChunk({locationStream(), scaleStream(2) + "x"}));
+    const ToolResult result = runTool({"attach", plain, "--from", riff, "-o", out});
+    EXPECT_EQ(result.exitCode, 3) << "the odd byte is no entry";
+    EXPECT_THAT(result.errors, Not(HasSubstr("salvage")));
+    EXPECT_EQ(contentsOf(out), tinyMovie() + zulmAtom({locationStream(), scaleStream(2)}));
+}
+
+TEST_F(AttachCommand, TakesAStreamFileBesideAnotherMovieAndInPlaceOfItsStreamWhereItMayReplace) {
+    const std::string old = stream("Old.mp4", media() + zulmAtom({appNameStream()}));
+    ASSERT_EQ(runTool({"attach", plain, streamFile("cpuUsage"), "--from", old, "-o", out}).exitCode, 0);
+    EXPECT_EQ(streamsIn(out).size(), 2U);
+    const std::string newer = stream("newer.dat", streamHeader(s_appNames, 1, 0) + textEntry(0, "New"));
+    EXPECT_EQ(runTool({"attach", plain, newer, "--from", old, "-o", out, "--force"}).exitCode, 1);
+    EXPECT_EQ(runTool({"attach", plain, newer, "--from", old, "-o", out, "--force", "--replace"}).exitCode, 0);
+    EXPECT_EQ(contentsOf(out), tinyMovie() + zulmAtom({contentsOf(newer)}));
+}
+
+TEST_F(AttachCommand, EndsWithFourWhereThereIsNothingToCarryOver) {
+    const ToolResult result = runTool({"attach", plain, "--from", stream("Old.mp4", media()), "-o", out});
+    EXPECT_EQ(result.exitCode, 4);
+    EXPECT_THAT(result.errors, HasSubstr("no recording metadata in it; nothing was written"));
+    EXPECT_FALSE(std::filesystem::exists(out));
+}
+
+TEST_F(AttachCommand, SaysWhereTheOldMovieHidesStreams) {
+    const std::string old = stream("Old.mp4", media());
+    MP4MetaData::appendMetaDataFiles(old, {stream("a.dat", locationStream() + "torn"), streamFile("cpuUsage")});
+    const ToolResult result = runTool({"attach", plain, "--from", old, "-o", out});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.errors, HasSubstr("its metadata cannot be walked to the end; 'zulm salvage " + old));
+    EXPECT_EQ(contentsOf(out), tinyMovie() + zulmAtom({locationStream()}));
+}
+
+TEST_F(AttachCommand, SaysWhereTheOldMovieIsCutShort) {
+    const std::string whole = media() + zulmAtom({locationStream()});
+    const ToolResult result =
+        runTool({"attach", plain, "--from", stream("Old.mp4", whole.substr(0, whole.size() - 9)), "-o", out});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.errors, HasSubstr("cursorLocation at offset 62 declares 56 bytes, 47 of which are there"));
+    EXPECT_EQ(contentsOf(out), tinyMovie() + zulmAtom({locationStream().substr(0, 40)}));
+}
+
+TEST_F(AttachCommand, SurvivesOldMoviesWithHostileSizes) {
+    for (const std::uint64_t size : s_hostileSizes) {
+        const std::string children = be32(1) + "DATA" + be64(size) + locationStream();
+        const std::string old = stream("Old.mp4", media() + extendedAtom("ZULM", children));
+        const ToolResult result = runTool({"attach", plain, "--from", old, "-o", out, "--force"});
+        EXPECT_THAT(result.exitCode, testing::AnyOf(0, 3, 4)) << size << '\n' << result.errors;
+        for (const auto& [type, bytes] : streamsIn(out))
+            EXPECT_TRUE(locationStream().starts_with(bytes)) << size;
+        std::filesystem::remove(out);
+    }
+}
+
+// Outputs ---------------------------------------------------------------------------------------------------------
+
+TEST_F(AttachCommand, ReplacesAnOutputOnlyByForceAndNeverAnInput) {
+    writeFile(out, "mine");
+    EXPECT_EQ(runTool({"attach", plain, streamFile("cpuUsage"), "-o", out}).exitCode, 1);
+    EXPECT_EQ(contentsOf(out), "mine");
+    EXPECT_EQ(runTool({"attach", plain, streamFile("cpuUsage"), "-o", out, "--force"}).exitCode, 0);
+    std::filesystem::create_hard_link(plain, folder / "Hard.mp4");
+    std::filesystem::create_symlink(plain, folder / "Soft.mp4");
+    for (const std::string& same : {plain, folder / "Hard.mp4", folder / "Soft.mp4"}) {
+        const ToolResult result = runTool({"attach", plain, streamFile("cpuUsage"), "-o", same, "--force"});
+        EXPECT_EQ(result.exitCode, 1) << same;
+        EXPECT_THAT(result.errors, HasSubstr("is the input " + plain + " itself"));
+    }
+    const std::string old = copyOf(movie(), "Old.mp4");
+    EXPECT_EQ(runTool({"attach", plain, "--from", old, "-o", old, "--force"}).exitCode, 1);
+    EXPECT_EQ(contentsOf(old), contentsOf(movie()));
+    EXPECT_EQ(contentsOf(plain), tinyMovie());
+}
+
+TEST_F(AttachCommand, RefusesMoviesThatAreNone) {
+    const std::string cpu = streamFile("cpuUsage");
+    const std::string broken = stream("Broken.mp4", media() + be32(100) + "free");
+    const ToolResult result = runTool({"attach", broken, cpu, "--in-place"});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("the atom 'free' at offset 30 declares 100 bytes"));
+    EXPECT_THAT(result.errors, HasSubstr("'zulm salvage " + broken + " -o DIR'"));
+    EXPECT_EQ(contentsOf(broken), media() + be32(100) + "free");
+    EXPECT_EQ(runTool({"attach", stream("Empty.mp4", ""), cpu, "--in-place"}).exitCode, 1);
+    EXPECT_EQ(runTool({"attach", stream("a.avi", riffMedia()), cpu, "--in-place"}).exitCode, 1);
+    EXPECT_EQ(runTool({"attach", folder / "missing.mp4", cpu, "--in-place"}).exitCode, 1);
+    EXPECT_EQ(runTool({"attach", plain, cpu, "-o", folder / "Out.bin"}).exitCode, 1);
+    EXPECT_EQ(runTool({"attach", plain, cpu, "-o", folder / "no folder/Out.mp4"}).exitCode, 1);
+}
+
+TEST_F(AttachCommand, LeavesNoTraceOfAnAppendThatFails) {
+    const std::string large = stream("large.dat", streamHeader(s_cursorLocations, 1, 16) + std::string(1 << 20, 'x'));
+    const std::string open = stream("Open.mp4", be32(0) + "mdat" + "0123456789");
+    const auto names = namesInFolder();
+    const std::string limited = "ulimit -f 100; exec \"$0\" \"$@\"";
+    for (const std::vector<std::string>& destination : {std::vector<std::string>{"--in-place"}, {"-o", out}}) {
+        std::vector<std::string> arguments{"-c", limited, ZULM_PATH, "attach", open, large};
+        arguments.insert(arguments.end(), destination.begin(), destination.end());
+        const ToolResult result = runProgram("sh", arguments);
+        EXPECT_EQ(result.exitCode, 1) << result.errors;
+        EXPECT_THAT(result.errors, HasSubstr("cannot be written at offset"));
+        EXPECT_EQ(contentsOf(open), be32(0) + "mdat" + "0123456789");
+        EXPECT_EQ(namesInFolder(), names);
+    }
+}
+
+TEST_F(AttachCommand, UndoesWhatASignalInterrupts) {
+    const std::string huge = folder / "huge.dat";
+    writeSparseFile(huge, 24 + (std::uint64_t(16) << 32), streamHeader(s_cursorLocations, 1, 16)); // takes minutes
+    for (const int signal : {2, 15}) {
+        ToolOptions options;
+        options.killAfterMilliseconds = 300;
+        options.killSignal = signal;
+        const ToolResult result = runTool({"attach", plain, huge, "--in-place"}, options);
+        EXPECT_EQ(result.exitCode, 128 + signal) << result.errors;
+        EXPECT_THAT(result.errors, HasSubstr("interrupted; it is what it was before"));
+        EXPECT_EQ(contentsOf(plain), tinyMovie());
+    }
+}
+
+} // namespace
+
+} // namespace ZULMetaData::Test

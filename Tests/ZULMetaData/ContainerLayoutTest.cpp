@@ -1,0 +1,85 @@
+// The items of containers as their headers declare them.
+
+#include "ZULMetaData/ContainerLayout.h"
+
+#include "Tests/Support/Bytes.h"
+
+#include <gtest/gtest.h>
+
+#include <sstream>
+
+namespace ZULMetaData::Test {
+namespace {
+
+std::vector<ContainerItem> itemsOf(const std::string& bytes,
+                                   MetaDataParser::StreamType type = MetaDataParser::QuickTime) {
+    std::stringstream stream(bytes);
+    return listTopLevel(stream, type);
+}
+
+TEST(ContainerLayout, GivesPlaceAndSizeOfEveryAtom) {
+    const auto atoms = itemsOf(atom("ftyp", "isom") + extendedAtom("mdat", "12345") + atom("free"));
+    ASSERT_EQ(atoms.size(), 3U);
+    EXPECT_EQ(atoms[1].type, "mdat");
+    EXPECT_EQ(atoms[1].offset, 12U);
+    EXPECT_EQ(atoms[1].headerSize, 16U);
+    EXPECT_EQ(atoms[1].size, 21U);
+    EXPECT_EQ(atoms[1].payloadOffset(), 28U);
+    EXPECT_EQ(atoms[1].payloadSize(), 5U);
+    EXPECT_EQ(atoms[2].offset, 33U);
+}
+
+TEST(ContainerLayout, TellsTheFormsOfHeadersApart) {
+    const auto atoms = itemsOf(atom("ftyp") + be32(5) + "oddl" + be64(16) + extendedAtom("mdat"));
+    ASSERT_EQ(atoms.size(), 3U);
+    EXPECT_FALSE(atoms[0].isExtended());
+    EXPECT_EQ(atoms[0].sizeField, 8U);
+    EXPECT_TRUE(atoms[1].isExtended()); // any number below 8 announces it
+    EXPECT_EQ(atoms[1].sizeField, 5U);
+    EXPECT_EQ(atoms[1].size, 16U);
+    EXPECT_EQ(atoms[2].sizeField, 1U);
+}
+
+TEST(ContainerLayout, KeepsThe32BitNumberOfAnOpenEnd) {
+    const auto atoms = itemsOf(atom("ftyp") + be32(0) + "mdat" + "pictures");
+    ASSERT_EQ(atoms.size(), 2U);
+    EXPECT_EQ(atoms[1].sizeField, 0U);
+}
+
+TEST(ContainerLayout, KnowsWhatHoldsMetaDataAndStreams) {
+    const auto atoms = itemsOf(atom("ZULM") + atom("DATA") + atom("mdat"));
+    EXPECT_TRUE(atoms[0].holdsMetaData() && !atoms[0].holdsStream());
+    EXPECT_TRUE(atoms[1].holdsStream() && !atoms[1].holdsMetaData());
+    EXPECT_FALSE(atoms[2].holdsStream() || atoms[2].holdsMetaData());
+    const auto chunks = itemsOf(chunk("ZULM", chunk("DATA")), MetaDataParser::Riff);
+    EXPECT_TRUE(chunks[0].holdsMetaData());
+}
+
+TEST(ContainerLayout, GivesChunksWithoutTheirPadByte) {
+    const auto chunks = itemsOf(chunk("RIFF", "odd") + chunk("junk", "even"), MetaDataParser::Riff);
+    ASSERT_EQ(chunks.size(), 2U);
+    EXPECT_EQ(chunks[0].size, 11U);
+    EXPECT_EQ(chunks[0].sizeField, 3U);
+    EXPECT_EQ(chunks[1].offset, 12U);
+}
+
+TEST(ContainerLayout, EndsBehindAnItemThatNothingCanFollow) {
+    EXPECT_EQ(itemsOf(be32(100) + "mdat" + atom("free")).size(), 1U);         // reaches beyond the end
+    EXPECT_EQ(itemsOf(be32(1) + "mdat" + be64(0) + atom("free")).size(), 1U); // has no size yet
+    EXPECT_EQ(itemsOf(atom("ftyp") + "1234567").size(), 1U);                  // too few bytes for a header
+    EXPECT_TRUE(itemsOf("").empty());
+}
+
+TEST(ContainerLayout, ListsTheInsideOfAnAtom) {
+    std::stringstream stream(atom("moov", atom("mvhd") + atom("trak", "x")) + atom("free"));
+    const auto children = listAtoms(stream, 8, 25, 33);
+    ASSERT_EQ(children.size(), 2U);
+    EXPECT_EQ(children[1].type, "trak");
+}
+
+TEST(ContainerLayout, HasNothingToListInABareStream) {
+    EXPECT_TRUE(itemsOf(streamHeader("2b7b6af2", 1, 16), MetaDataParser::RawStream).empty());
+}
+
+} // namespace
+} // namespace ZULMetaData::Test

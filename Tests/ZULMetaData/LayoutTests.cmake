@@ -1,0 +1,3 @@
+zulm_add_test(ZULMetaData/ContainerLayoutTest)
+zulm_add_test(ZULMetaData/ContainerRecognitionTest)
+zulm_add_test(ZULMetaData/MovieDurationTest)

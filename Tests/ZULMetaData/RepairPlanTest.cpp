@@ -1,0 +1,279 @@
+// What a repair would change in a movie, byte by byte.
+
+#include "ZULMetaData/RepairPlan.h"
+
+#include "Tests/Support/Bytes.h"
+#include "Tests/Support/Files.h"
+#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "ZULMetaData/StreamExtent.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <fstream>
+#include <map>
+#include <sstream>
+#include <string>
+
+namespace ZULMetaData::Test {
+
+namespace {
+
+using testing::HasSubstr;
+
+constexpr std::uint64_t s_4GiB = 0x100000000;
+
+RepairPlan planFor(const std::string& movie) {
+    std::istringstream stream(movie);
+    return planRepair(stream);
+}
+
+/// A movie of `size` bytes that begins and ends as told and is empty in between.
+RepairPlan planForLarge(std::uint64_t size, const std::string& head, const std::string& tail = {}) {
+    const TemporaryFolder folder;
+    writeSparseFile(folder / "movie.mp4", size, head, tail);
+    std::ifstream stream(folder / "movie.mp4", std::ios::binary);
+    return planRepair(stream);
+}
+
+std::string carriedOut(std::string movie, const RepairPlan& plan) {
+    for (const RepairChange& change : plan.changes) {
+        EXPECT_EQ(movie.substr(change.offset, change.before.size()), change.before);
+        if (change.after.empty())
+            EXPECT_EQ(change.offset + change.before.size(), movie.size());
+        else
+            EXPECT_EQ(change.after.size(), change.before.size());
+        movie.replace(change.offset, change.before.size(), change.after);
+    }
+    return movie;
+}
+
+std::string repaired(const std::string& movie) {
+    const RepairPlan plan = planFor(movie);
+    EXPECT_EQ(plan.state, RepairPlan::Repairable) << plan.finding;
+    return carriedOut(movie, plan);
+}
+
+void expectWhole(const RepairPlan& plan) {
+    EXPECT_EQ(plan.state, RepairPlan::Whole) << plan.finding;
+    EXPECT_TRUE(plan.changes.empty());
+    EXPECT_EQ(plan.finding, "");
+}
+
+void expectUnrepairable(const RepairPlan& plan, std::uint64_t offset, const std::string& finding) {
+    EXPECT_EQ(plan.state, RepairPlan::Unrepairable);
+    EXPECT_TRUE(plan.changes.empty());
+    EXPECT_EQ(plan.offset, offset);
+    EXPECT_THAT(plan.finding, HasSubstr(finding));
+}
+
+void expectOneChange(const RepairPlan& plan, std::uint64_t offset, const std::string& before,
+                     const std::string& after) {
+    EXPECT_EQ(plan.state, RepairPlan::Repairable) << plan.finding;
+    ASSERT_EQ(plan.changes.size(), 1U);
+    EXPECT_EQ(plan.changes[0].offset, offset);
+    EXPECT_EQ(plan.changes[0].before, before);
+    EXPECT_EQ(plan.changes[0].after, after);
+    EXPECT_FALSE(plan.hasLoss);
+}
+
+std::string interrupted(const std::string& type, const std::string& payload) {
+    return be32(1) + type + be64(0) + payload;
+}
+
+// Movies that need nothing ----------------------------------------------------------------------------------------
+
+TEST(RepairPlan, LeavesAMovieWhoseAtomsFillIt) {
+    expectWhole(planFor(media()));
+    expectWhole(planFor(media() + zulmAtom({locationStream()}) + extendedAtom("ZULR", std::string(64, '\0'))));
+    expectWhole(planFor(atom("wide")));
+    expectWhole(planFor(""));
+}
+
+// An open end -----------------------------------------------------------------------------------------------------
+
+TEST(RepairPlan, GivesAnOpenEndedAtomItsSize) {
+    const RepairPlan plan = planFor(atom("ftyp", "mp42") + be32(0) + "mdat0123456789");
+    expectOneChange(plan, 12, be32(0), be32(18));
+    EXPECT_EQ(plan.finding, "the atom 'mdat' at offset 12 has an open end");
+    EXPECT_EQ(plan.offset, 12U);
+}
+
+TEST(RepairPlan, KeepsThe32BitSizeUpToItsLastNumber) {
+    expectOneChange(planForLarge(12 + std::uint64_t(0xffffffff), atom("ftyp", "mp42") + be32(0) + "mdat"), 12, be32(0),
+                    be32(0xffffffff));
+}
+
+TEST(RepairPlan, TakesTheSpareAtomInAtFourGiBAndMore) {
+    for (const std::uint64_t length : {s_4GiB, s_4GiB + 1, 5 * (s_4GiB / 4)})
+        expectOneChange(planForLarge(20 + length, atom("ftyp", "mp42") + atom("wide") + be32(0) + "mdat"), 12,
+                        atom("wide") + be32(0) + "mdat", be32(1) + "mdat" + be64(length + 8));
+}
+
+TEST(RepairPlan, CannotSizeAnOpenEndOfFourGiBWithoutTheSpareAtomDirectlyInFront) {
+    for (const std::string& front : {atom("ftyp", "mp42"), atom("wide", "more"), atom("wide") + atom("free")})
+        expectUnrepairable(planForLarge(front.size() + s_4GiB, front + be32(0) + "mdat"), front.size(),
+                           "has an open end, and its 4294967296 bytes do not fit in a 32-bit size");
+}
+
+// Eight bytes short -----------------------------------------------------------------------------------------------
+
+/// What the described repair makes of a movie of 4 GiB and more, then `behind`.
+RepairPlan planForShortMovie(const std::string& lastBytes, const std::string& behind = {}) {
+    const std::string head = atom("ftyp", "mp42") + be32(1) + "mdat" + be64(s_4GiB);
+    return planForLarge(12 + s_4GiB + 8 + behind.size(), head, lastBytes + behind);
+}
+
+TEST(RepairPlan, TakesInTheEightBytesThatARepairLeftOver) {
+    for (const std::string& last : {hex("0000000000000000"), hex("0001020304050607"), hex("ffffffffffffffff")}) {
+        const RepairPlan plan = planForShortMovie(last);
+        expectOneChange(plan, 20, be64(s_4GiB), be64(s_4GiB + 8));
+        EXPECT_EQ(plan.finding, "the atom 'mdat' at offset 12 was given a length that leaves out its last 8 bytes");
+    }
+}
+
+TEST(RepairPlan, TakesThemInWhereSomethingWasAppendedBehindThem) {
+    const std::string stamp = extendedAtom("ZULR", std::string(64, '\0'));
+    for (const std::string& last : {hex("0000000000000000"), std::string("\0\0\0\x64moov", 8), std::string("textmdat")})
+        for (const std::string& behind : {zulmAtom({locationStream()}), stamp, stamp + zulmAtom({locationStream()})})
+            expectOneChange(planForShortMovie(last, behind), 20, be64(s_4GiB), be64(s_4GiB + 8));
+}
+
+TEST(RepairPlan, GoesOnToAnInterruptedAppendBehindThem) {
+    const RepairPlan plan =
+        planForShortMovie(hex("0000000000000000"), interrupted("ZULM", extendedAtom("DATA", locationStream())));
+    ASSERT_EQ(plan.changes.size(), 2U);
+    EXPECT_EQ(plan.changes[0].after, be64(s_4GiB + 8));
+    EXPECT_EQ(plan.changes[1].offset, 12 + s_4GiB + 8 + 8);
+    EXPECT_EQ(plan.changes[1].after, be64(16 + 16 + 56));
+}
+
+TEST(RepairPlan, LeavesEightBytesThatAreAnAtom) {
+    expectWhole(planForShortMovie(atom("free")));
+    expectWhole(planForShortMovie(atom("free"), zulmAtom({locationStream()})));
+}
+
+TEST(RepairPlan, LeavesEightBytesThatMayBeTheHeaderOfAnAtomThatWasCutShort) {
+    expectUnrepairable(planForShortMovie(be32(5000000) + "moov"), 12 + s_4GiB, "but the file ends after 8");
+}
+
+TEST(RepairPlan, LeavesWhatIsNeitherShortNorAppended) {
+    expectUnrepairable(planForShortMovie(hex("ffffffffffffffff"), "junk and more junk"), 12 + s_4GiB,
+                       "without a readable type");
+    const std::string small = atom("ftyp", "mp42") + extendedAtom("mdat", "media") + hex("ffffffffffffffff");
+    expectUnrepairable(planFor(small), 12 + 21, "without a readable type");
+}
+
+// An append that was interrupted ----------------------------------------------------------------------------------
+
+TEST(RepairPlan, GivesAnInterruptedAtomItsSize) {
+    expectOneChange(planFor(media() + interrupted("mdat", "0123")), 30 + 8, be64(0), be64(20));
+    const RepairPlan plan = planFor(media() + interrupted("ZULR", "0123"));
+    expectOneChange(plan, 30 + 8, be64(0), be64(20));
+    EXPECT_EQ(plan.finding, "the atom 'ZULR' at offset 30 was appended, but never given its size");
+}
+
+TEST(RepairPlan, KeepsEveryStreamOfAnInterruptedAppendThatIsWhole) {
+    const std::string children = extendedAtom("DATA", locationStream()) + extendedAtom("DATA", appNameStream());
+    expectOneChange(planFor(media() + interrupted("ZULM", children)), 30 + 8, be64(0), be64(16 + 72 + 72));
+    expectOneChange(planFor(media() + interrupted("ZULM", "")), 30 + 8, be64(0), be64(16));
+}
+
+TEST(RepairPlan, SetsTheBytesOfATornEntryAside) {
+    const std::string torn = be32(1) + "DATA" + be64(72) + locationStream().substr(0, 24 + 16 + 11);
+    const std::string movie = media() + interrupted("ZULM", torn);
+    const RepairPlan plan = planFor(movie);
+    EXPECT_TRUE(plan.hasLoss);
+    const std::string leftOver = be32(11) + "free" + pointEntry(1.0, -3, 7).substr(8, 3);
+    EXPECT_EQ(carriedOut(movie, plan), media() + zulmAtom({locationStream().substr(0, 40)}) + leftOver);
+}
+
+TEST(RepairPlan, CutsOffTornBytesThatAreTooFewForAnAtom) {
+    const std::string torn = be32(1) + "DATA" + be64(72) + locationStream().substr(0, 24 + 16 + 7);
+    EXPECT_EQ(repaired(media() + interrupted("ZULM", torn)), media() + zulmAtom({locationStream().substr(0, 40)}));
+}
+
+TEST(RepairPlan, ChangesNothingButOneSizeWhereStreamsCannotBeFollowed) {
+    // The first stream's size counts a torn tail that is not there, as the described append writes it.
+    for (const std::uint64_t size : {72U + 5, 72U + 500}) {
+        const std::string children =
+            be32(1) + "DATA" + be64(size) + appNameStream() + extendedAtom("DATA", locationStream());
+        const RepairPlan plan = planFor(media() + interrupted("ZULM", children));
+        ASSERT_EQ(plan.changes.size(), 1U) << size;
+        EXPECT_EQ(plan.changes[0].after, be64(16 + 72 + 72));
+        EXPECT_TRUE(plan.hasLoss);
+    }
+}
+
+/// Every stream found in the movie holds only what was written, in whole entries, and another one that is appended
+/// is found too.
+void expectSound(const std::string& movie, const std::map<uuid, std::string>& written) {
+    expectWhole(planFor(movie));
+    ASSERT_TRUE(movie.starts_with(media()));
+    std::istringstream stream(movie + zulmAtom({scaleStream(2.0)}));
+    const auto parser = MetaDataParser::create(stream, MetaDataParser::QuickTime);
+    std::map<uuid, std::string> found;
+    parser->loadAllData(found);
+    ASSERT_EQ(found.erase(kind(s_scaleFactors)), 1U);
+    for (const auto& [type, bytes] : found) {
+        ASSERT_TRUE(written.contains(type));
+        EXPECT_TRUE(written.at(type).starts_with(bytes));
+        std::istringstream one(bytes);
+        EXPECT_EQ(measureStream(one, 0, bytes.size())->wholeBytes, bytes.size());
+    }
+}
+
+TEST(RepairPlan, MendsAnAppendThatWasInterruptedAtAnyByte) {
+    const std::string children = extendedAtom("DATA", locationStream()) + extendedAtom("DATA", appNameStream());
+    const std::string movie = media() + interrupted("ZULM", children);
+    const std::map<uuid, std::string> written{{kind(s_cursorLocations), locationStream()},
+                                              {kind(s_appNames), appNameStream()}};
+    for (std::size_t length = media().size() + 16; length <= movie.size(); ++length) {
+        SCOPED_TRACE(length);
+        expectSound(repaired(movie.substr(0, length)), written);
+    }
+}
+
+TEST(RepairPlan, CannotMendAHeaderThatIsCutShort) {
+    const std::string movie = media() + interrupted("ZULM", "");
+    for (std::size_t length = 31; length < 46; ++length)
+        expectUnrepairable(planFor(movie.substr(0, length)), 30, "do not hold an atom's header");
+}
+
+// Movies that are broken ------------------------------------------------------------------------------------------
+
+TEST(RepairPlan, CannotMendAnAtomThatReachesBeyondTheEnd) {
+    expectUnrepairable(planFor(media() + be32(100) + "free"), 30,
+                       "the atom 'free' at offset 30 declares 100 bytes, but the file ends after 8");
+    expectUnrepairable(planFor(media() + be32(1) + "free" + be64(0xffffffffffffffff)), 30,
+                       "but the file ends after 16");
+}
+
+TEST(RepairPlan, CannotMendAnAtomSmallerThanItsHeader) {
+    for (std::uint32_t size = 2; size < 8; ++size)
+        expectUnrepairable(planFor(media() + be32(size) + "free" + std::string(30, '\0')), 30,
+                           "which its own header does not fit in");
+    for (std::uint64_t size = 1; size < 16; ++size)
+        expectUnrepairable(planFor(media() + be32(1) + "free" + be64(size)), 30,
+                           "which its own header does not fit in");
+}
+
+TEST(RepairPlan, AlwaysComesToAnEnd) {
+    for (const std::uint64_t size : s_hostileSizes)
+        for (const std::string type : {"free", "ZULM", "ZULR", "mdat"}) {
+            const std::string hostile = be32(1) + type + be64(size) + extendedAtom("DATA", locationStream());
+            for (const std::string& movie : {hostile, media() + hostile, hostile + be32(0) + "mdat"}) {
+                const RepairPlan plan = planFor(movie);
+                if (plan.state == RepairPlan::Repairable)
+                    expectWhole(planFor(carriedOut(movie, plan)));
+            }
+        }
+    for (const std::uint64_t size : s_hostileSizes) {
+        const std::string movie = media() + interrupted("ZULM", be32(1) + "DATA" + be64(size) + locationStream());
+        expectWhole(planFor(repaired(movie)));
+    }
+}
+
+} // namespace
+
+} // namespace ZULMetaData::Test

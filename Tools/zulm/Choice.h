@@ -1,0 +1,46 @@
+#pragma once
+
+// Option values that are names out of a short list, and the help for names that are not.
+
+#include <CLI/CLI.hpp>
+#include <fmt/core.h>
+#include <fmt/ranges.h>
+
+#include <algorithm>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+namespace Zulm {
+
+/// The candidate that `word` was probably meant to be; empty where none is near.
+std::string nearestTo(std::string_view word, const std::vector<std::string>& candidates);
+
+/// "; did you mean X?" or nothing.
+std::string suggestionFor(std::string_view word, const std::vector<std::string>& candidates);
+
+/// An option whose value is a finite number of seconds.
+CLI::Option* addSeconds(CLI::App& command, const std::string& name, std::optional<double>& value,
+                        const std::string& description);
+
+/// An option whose value is the one of `values` that is named. Its type name lists the names, as "text|json".
+template <class Value>
+CLI::Option* addChoice(CLI::App& command, const std::string& name, Value& value, const std::string& description,
+                       std::vector<std::pair<std::string, Value>> values) {
+    std::vector<std::string> names;
+    for (const auto& choice : values)
+        names.push_back(choice.first);
+    const auto choose = [&value, values = std::move(values), names, name](const std::string& word) {
+        const auto found = std::ranges::find(names, word);
+        if (found == names.end())
+            throw CLI::ValidationError(
+                name, fmt::format("{} is none of {}{}", word, fmt::join(names, ", "), suggestionFor(word, names)));
+        value = values[static_cast<std::size_t>(found - names.begin())].second;
+    };
+    return command.add_option_function<std::string>(name, choose, description)
+        ->type_name(fmt::format("{}", fmt::join(names, "|")));
+}
+
+} // namespace Zulm

@@ -1,0 +1,181 @@
+#include "Tools/zulm/CaptionFormat.h"
+#include "Tools/zulm/Choice.h"
+#include "Tools/zulm/HeldStreams.h"
+#include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/OutputFile.h"
+#include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
+
+#include <fmt/core.h>
+
+#include <algorithm>
+#include <limits>
+#include <memory>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+
+namespace {
+
+struct ConvertOptions {
+    std::string file;
+    CaptionFormat format = CaptionFormat::SRT;
+    std::string output;
+    std::vector<std::string> kinds;
+    double pause = 1;
+    bool showsKeys = false;
+    bool force = false;
+};
+
+constexpr double s_untilTheNext = std::numeric_limits<double>::infinity();
+
+/// Collects what is said in the streams of one recording.
+class CaptionReader {
+public:
+    CaptionReader(const ConvertOptions& options, Recording& recording) : options_(options), recording_(recording) {}
+
+    void read(const HeldStream& stream) {
+        RecordedKinds::visit(stream.type, [&]<class Kind>() { readKind<Kind>(stream); });
+    }
+
+    const std::vector<Caption>& captions() const { return captions_; }
+    ExitCode code() const { return code_; }
+
+private:
+    template <class Kind>
+    void readKind(const HeldStream& stream) {
+        if constexpr (std::same_as<typename Kind::Value, KeyStroke>) {
+            std::vector<KeyEvent> keys;
+            walk<KeyStroke>(stream, [&](double time, const KeyStroke& key) { keys.push_back({time, key}); });
+            const auto found = keyCaptions(std::move(keys), options_.pause, options_.showsKeys);
+            captions_.insert(captions_.end(), found.begin(), found.end());
+        } else if constexpr (std::same_as<typename Kind::Value, std::string>) {
+            std::string last = "\n"; // no title is like it
+            walk<std::string>(stream, [&](double time, const std::string& stored) {
+                const std::string text = titleOf(stored);
+                if (text != last)
+                    captions_.push_back({time, s_untilTheNext, text});
+                last = text;
+            });
+        }
+    }
+
+    static std::string titleOf(const std::string& stored) {
+        const std::string text = validText(stored.substr(0, stored.find('\0')));
+        const bool isBlank = text.find_first_not_of(" \t\r\n") == std::string::npos;
+        return isBlank ? "(untitled)" : text;
+    }
+
+    template <class Value, class Visit>
+    void walk(const HeldStream& stream, Visit visit) {
+        StreamEntries entries = entriesOf(recording_, stream);
+        std::uint64_t end = 0;
+        std::uint64_t skipped = 0;
+        if (entries.header() && isDecodable(*entries.header())) {
+            end = entries.wholeBytes();
+            while (const auto entry = entries.next()) {
+                const auto decoded = decodeEntry<Value>(entries.bytesOf(*entry), entries.header()->version);
+                if (!decoded)
+                    break;
+                end = entry->end();
+                if (isShowable(decoded->time))
+                    visit(decoded->time, decoded->value);
+                else
+                    ++skipped;
+            }
+        }
+        complainAbout(stream, end, skipped);
+    }
+
+    void complainAbout(const HeldStream& stream, std::uint64_t end, std::uint64_t skipped) {
+        if (skipped > 0)
+            complain(fmt::format("{}: {}: left out {} {} whose time lies before the beginning or is none",
+                                 recording_.name(), stream.name(), skipped, skipped == 1 ? "entry" : "entries"));
+        if (end < stream.declared)
+            complain(fmt::format("{}: {} cannot be read from offset {} on; 'zulm verify {}' says more",
+                                 recording_.name(), stream.name(), stream.offset + end, recording_.name()));
+        if (skipped > 0 || end < stream.declared)
+            code_ = ExitDamaged;
+    }
+
+    const ConvertOptions& options_;
+    Recording& recording_;
+    std::vector<Caption> captions_;
+    ExitCode code_ = ExitFine;
+};
+
+std::vector<std::string> kindsFor(const ConvertOptions& options) {
+    if (!options.kinds.empty())
+        return options.kinds;
+    return holdsChapters(options.format) ? std::vector<std::string>{"slideTitles", "topmostWindowTitle"}
+                                         : std::vector<std::string>{"keyboardAction"};
+}
+
+ExitCode runConvert(const ConvertOptions& options) {
+    const InputFile input(options.file);
+    Recording recording(input.path(), input.name());
+    const std::vector<std::string> kinds = kindsFor(options);
+    const std::vector<HeldStream> streams = heldStreams(recording, kinds);
+    if (streams.empty())
+        return complainAboutNothing(recording, kinds);
+    CaptionReader reader(options, recording);
+    for (const HeldStream& stream : streams)
+        reader.read(stream);
+    const double duration = movieDuration(recording.parser()).value_or(0);
+    const std::string text =
+        formatted(placed(reader.captions(), unitsPerSecond(options.format), duration), options.format);
+    if (options.output.empty())
+        writeOutput(text);
+    else
+        writeWholeFile(options.output, text, {input.path()}, options.force);
+    return reader.code();
+}
+
+bool hasWords(const std::string& kind) {
+    bool result = false;
+    RecordedKinds::visit(typeNamed(kind), [&]<class Kind>() {
+        using Value = typename Kind::Value;
+        result = std::same_as<Value, std::string> || std::same_as<Value, KeyStroke>;
+    });
+    return result;
+}
+
+} // namespace
+
+void addConvertCommand(CLI::App& app, Action& chosen) {
+    auto options = std::make_shared<ConvertOptions>();
+    CLI::App* command = app.add_subcommand(
+        "convert", "Write keystrokes as captions (srt, vtt, ass), or titles as chapters (ffmetadata, chapters). What "
+                   "was typed shows as bullets");
+    command->add_option("FILE", options->file, "A movie, RIFF file or stream file; - is standard input")->required();
+    addChoice(*command, "--to", options->format, "What to write",
+              {{"srt", CaptionFormat::SRT},
+               {"vtt", CaptionFormat::VTT},
+               {"ass", CaptionFormat::ASS},
+               {"ffmetadata", CaptionFormat::FFMetaData},
+               {"chapters", CaptionFormat::Chapters}})
+        ->required();
+    command->add_option("-o,--output", options->output, "Write to this file instead of standard output")
+        ->type_name("OUT");
+    addStreamOption(*command, options->kinds,
+                    "What to write: keyboardAction, or a kind of texts (repeatable). Without it, keyboardAction as "
+                    "captions, slideTitles and topmostWindowTitle as chapters");
+    command->add_option("--pause", options->pause, "Keys further apart than this make two captions")
+        ->type_name("SECONDS")
+        ->check(CLI::Range(0.001, 3600.0).description(""))
+        ->capture_default_str();
+    command->add_flag("--show-keys", options->showsKeys, "Show what was typed, passwords included");
+    command->add_flag("--force", options->force, "Replace OUT where it exists");
+    command->footer("zulm convert --to srt Recording.mp4 -o Recording.srt\n"
+                    "zulm convert --to ffmetadata Recording.mp4 | ffmpeg -i Recording.mp4 -i - -map_metadata 1 -c copy "
+                    "Chapters.mp4");
+    command->callback([options, &chosen] {
+        for (const std::string& kind : options->kinds)
+            if (!hasWords(kind))
+                throw CLI::ValidationError(fmt::format("--stream {}: it holds neither keystrokes nor texts", kind));
+        chosen = [options] { return runConvert(*options); };
+    });
+}
+
+} // namespace Zulm

@@ -1,0 +1,87 @@
+#include "Tools/zulm/HeldStreams.h"
+#include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/Report.h"
+#include "Tools/zulm/StandardStreams.h"
+
+#include <fmt/core.h>
+
+#include <memory>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+using Json = nlohmann::ordered_json;
+
+namespace {
+
+struct ExtractOptions {
+    std::string file;
+    std::string folder;
+    std::vector<std::string> kinds;
+    bool force = false;
+    bool json = false;
+};
+
+ExitCode complainAboutCut(const std::string& file, const HeldStream& stream) {
+    if (!stream.isCutShort())
+        return ExitFine;
+    complain(fmt::format("{}: {} at offset {} declares {} bytes, of which {} are there; 'zulm salvage {} -o DIR' may "
+                         "find more",
+                         file, stream.name(), stream.offset, stream.declared, stream.present, file));
+    return ExitDamaged;
+}
+
+Json streamDocument(const HeldStream& stream, const std::string& output) {
+    return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)},     {"offset", stream.offset},
+            {"bytes", stream.present},           {"declared_bytes", stream.declared}, {"file", output}};
+}
+
+std::vector<std::string> outputsFor(const std::vector<HeldStream>& streams, const std::string& folder) {
+    std::vector<std::string> outputs;
+    for (const HeldStream& stream : streams)
+        outputs.push_back(streamFileIn(folder, stream.type));
+    return outputs;
+}
+
+ExitCode runExtract(const ExtractOptions& options) {
+    const InputFile input(options.file);
+    Recording recording(input.path(), input.name());
+    const std::vector<HeldStream> streams = heldStreams(recording, options.kinds);
+    if (streams.empty())
+        return complainAboutNothing(recording, options.kinds);
+    createFolder(options.folder);
+    const std::vector<std::string> outputs = outputsFor(streams, options.folder);
+    requireFree(outputs, options.force);
+    Json document = fileHeader(input.name());
+    document["streams"] = Json::array();
+    ExitCode worst = ExitFine;
+    for (std::size_t i = 0; i < streams.size(); ++i) {
+        writePart(input.path(), streams[i].offset, streams[i].present, outputs[i], options.force);
+        worst = worseOf(worst, complainAboutCut(input.name(), streams[i]));
+        document["streams"].push_back(streamDocument(streams[i], outputs[i]));
+        if (!options.json)
+            writeOutput(fmt::format("{}: {} bytes\n", outputs[i], streams[i].present));
+    }
+    if (options.json)
+        printReport("extract", Json::array({document}));
+    return worst;
+}
+
+} // namespace
+
+void addExtractCommand(CLI::App& app, Action& chosen) {
+    auto options = std::make_shared<ExtractOptions>();
+    CLI::App* command = app.add_subcommand("extract", "Write each stream of a file as a stream file, byte for byte");
+    command->add_option("FILE", options->file, "A movie, RIFF file or stream file; - is standard input")->required();
+    command->add_option("-o,--output", options->folder, "The folder for KIND.dat, or UUID.dat of an unknown kind")
+        ->type_name("DIR")
+        ->required();
+    addStreamOption(*command, options->kinds, "Only this kind, such as cursorLocation, or UUID (repeatable)");
+    command->add_flag("--force", options->force, "Replace files that exist");
+    command->add_flag("--json", options->json, "Print one JSON document");
+    command->footer("zulm extract Recording.mp4 -o streams\n"
+                    "zulm extract Recording.mp4 -o streams --stream keyboardAction");
+    command->callback([options, &chosen] { chosen = [options] { return runExtract(*options); }; });
+}
+
+} // namespace Zulm

@@ -1,0 +1,23 @@
+#include "Tools/zulm/Findings.h"
+
+#include <fmt/core.h>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+
+std::string findingText(const Finding& finding) {
+    const bool isNotice = finding.severity() == Severity::Notice;
+    return fmt::format("{} at offset {}: {}{} [{}]", finding.place, finding.offset, isNotice ? "notice: " : "",
+                       finding.sentence, ruleOf(finding.code).name);
+}
+
+nlohmann::ordered_json findingDocument(const Finding& finding) {
+    return {{"code", ruleOf(finding.code).name},
+            {"severity", finding.severity() == Severity::Notice ? "notice" : "damage"},
+            {"place", finding.place},
+            {"offset", finding.offset},
+            {"message", finding.sentence}};
+}
+
+} // namespace Zulm

@@ -1,0 +1,19 @@
+#pragma once
+
+// What validating a file has found, for a person and for a program.
+
+#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+
+#include <nlohmann/json.hpp>
+
+#include <string>
+
+namespace Zulm {
+
+/// "cursorLocation at offset 56: the last entry has 4 of 16 bytes [torn-entry]"
+std::string findingText(const ZULMetaData::Finding& finding);
+
+/// {"code": ..., "severity": "damage" or "notice", "place": ..., "offset": ..., "message": ...}
+nlohmann::ordered_json findingDocument(const ZULMetaData::Finding& finding);
+
+} // namespace Zulm

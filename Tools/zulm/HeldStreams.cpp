@@ -1,0 +1,132 @@
+#include "Tools/zulm/HeldStreams.h"
+
+#include "Tools/zulm/Choice.h"
+#include "Tools/zulm/OutputFile.h"
+#include "Tools/zulm/Progress.h"
+
+#include <fmt/core.h>
+#include <fmt/ranges.h>
+
+#include <algorithm>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+
+namespace {
+
+constexpr std::size_t s_pieceSize = 1 << 20;
+
+bool isChosen(const uuid& type, const std::vector<std::string>& kinds) {
+    return kinds.empty() || std::ranges::any_of(kinds, [&](const auto& kind) { return typeNamed(kind) == type; });
+}
+
+/// Whether the text is an identifier, in digits of either case.
+bool isIdentifier(const std::string& text) {
+    uuid type{};
+    std::istringstream(text) >> type;
+    return CLI::detail::to_lower(text) == uuidText(type);
+}
+
+std::string checkKind(const std::string& kind) {
+    std::vector<std::string> names;
+    for (const MetaDataKind& registered : s_metaDataKinds)
+        names.emplace_back(registered.name);
+    if (isIdentifier(kind) || std::ranges::find(names, kind) != names.end())
+        return {};
+    return fmt::format("no kind of stream is called {}{}\nthe kinds are {}", kind, suggestionFor(kind, names),
+                       fmt::join(names, ", "));
+}
+
+} // namespace
+
+std::vector<HeldStream> heldStreams(Recording& recording, const std::vector<std::string>& kinds) {
+    MetaDataParser& parser = recording.parser();
+    parser.getStream().clear();
+    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(parser.getStream()));
+    std::vector<HeldStream> streams;
+    for (const uuid& type : parser.getAvailableMetaDataUUIDs()) {
+        const auto [offset, length] = parser.fileDataForUUID(type);
+        if (isChosen(type, kinds))
+            streams.push_back({type, offset, length, std::min(length, total - std::min(offset, total))});
+    }
+    return streams;
+}
+
+StreamEntries entriesOf(Recording& recording, const HeldStream& stream) {
+    const ReadBytes read = readingFrom(recording.parser().getStream());
+    return ZULMetaData::entriesOf(
+        [read, offset = stream.offset](std::uint64_t position, std::span<char> bytes) {
+            return read(offset + position, bytes);
+        },
+        stream.present);
+}
+
+CLI::Option* addStreamOption(CLI::App& command, std::vector<std::string>& kinds, const std::string& description,
+                             const std::string& name) {
+    return command.add_option(name, kinds, description)
+        ->type_name("KIND")
+        ->allow_extra_args(false)
+        ->check(CLI::Validator(checkKind, ""));
+}
+
+uuid typeNamed(const std::string& kind) {
+    const auto registered = std::ranges::find(s_metaDataKinds, kind, &MetaDataKind::name);
+    if (registered != s_metaDataKinds.end())
+        return registered->type;
+    uuid type{};
+    std::istringstream(kind) >> type;
+    return type;
+}
+
+ExitCode complainAboutNothing(const Recording& recording, const std::vector<std::string>& kinds) {
+    const std::string what = kinds.empty() ? "recording metadata" : fmt::format("stream {}", fmt::join(kinds, " or "));
+    complain(fmt::format("{}: has no {}; 'zulm info {}' lists what it has", recording.name(), what, recording.name()));
+    return ExitNoMetaData;
+}
+
+void createFolder(const std::string& folder) {
+    std::error_code error;
+    std::filesystem::create_directories(folder, error);
+    if (error)
+        throw Failure(fmt::format("{}: cannot be created: {}", folder, error.message()));
+    if (!std::filesystem::is_directory(folder, error))
+        throw Failure(fmt::format("{}: is no folder", folder));
+}
+
+std::string streamFileIn(const std::string& folder, const uuid& type, std::size_t number) {
+    const std::string suffix = number > 1 ? fmt::format("-{}", number) : "";
+    return (std::filesystem::path(folder) / fmt::format("{}{}.dat", nameOf(type), suffix)).string();
+}
+
+void requireFree(const std::vector<std::string>& outputs, bool force) {
+    for (const std::string& output : outputs)
+        if (!force && std::filesystem::exists(output))
+            throw Failure(fmt::format("{}: exists already; --force replaces it", output));
+}
+
+void writePart(const std::string& input, std::uint64_t offset, std::uint64_t size, const std::string& output,
+               bool force) {
+    OutputFile file(output, {input}, force);
+    std::ifstream from(input, std::ios::binary);
+    std::ofstream to(file.temporaryPath(), std::ios::binary);
+    Progress progress("writing " + output, size);
+    std::vector<char> piece(s_pieceSize);
+    from.seekg(static_cast<std::streamoff>(offset));
+    for (std::uint64_t left = size; left > 0; progress.moveTo(size - left)) {
+        from.read(piece.data(), static_cast<std::streamsize>(std::min<std::uint64_t>(left, piece.size())));
+        if (from.gcount() == 0)
+            throw Failure(fmt::format("{}: cannot be read at offset {}", input, offset + size - left));
+        to.write(piece.data(), from.gcount());
+        left -= static_cast<std::uint64_t>(from.gcount());
+    }
+    to.close();
+    if (!to)
+        throw Failure(fmt::format("{}: cannot be written", output));
+    file.commit();
+}
+
+} // namespace Zulm

@@ -1,0 +1,94 @@
+#include "Tools/zulm/InputFile.h"
+
+#include "Tools/zulm/Command.h"
+#include "Tools/zulm/TemporaryFile.h"
+#include "ZULMetaData/ContainerRecognition.h"
+
+#include <fmt/core.h>
+
+#include <array>
+#include <cerrno>
+#include <cstring>
+#include <fcntl.h>
+#include <filesystem>
+#include <string_view>
+#include <unistd.h>
+
+namespace Zulm {
+
+namespace {
+
+constexpr std::string_view s_standardInput = "-";
+
+/// As much as there is, up to `size`. Throws `Failure`.
+std::size_t readInput(char* bytes, std::size_t size) {
+    std::size_t filled = 0;
+    while (filled < size) {
+        const ssize_t got = read(STDIN_FILENO, bytes + filled, size - filled);
+        if (got < 0 && errno == EINTR)
+            continue;
+        if (got < 0)
+            throw Failure(fmt::format("{}: standard input cannot be read: {}", s_standardInput, std::strerror(errno)));
+        if (got == 0)
+            break;
+        filled += static_cast<std::size_t>(got);
+    }
+    return filled;
+}
+
+void writeAll(int file, const char* bytes, std::size_t size) {
+    while (size > 0) {
+        const ssize_t put = write(file, bytes, size);
+        if (put < 0 && errno == EINTR)
+            continue;
+        if (put < 0)
+            throw Failure(fmt::format("{}: cannot be kept in a temporary file: {}; TMPDIR names another folder",
+                                      s_standardInput, std::strerror(errno)));
+        bytes += put;
+        size -= static_cast<std::size_t>(put);
+    }
+}
+
+/// Closes it at the end of its scope.
+class Descriptor {
+public:
+    explicit Descriptor(const std::string& path) : number_(open(path.c_str(), O_WRONLY | O_CLOEXEC)) {}
+    ~Descriptor() { close(number_); }
+    Descriptor(const Descriptor&) = delete;
+    Descriptor& operator=(const Descriptor&) = delete;
+    int number() const { return number_; }
+
+private:
+    int number_;
+};
+
+} // namespace
+
+InputFile::InputFile(const std::string& argument) : name_(argument), path_(argument) {
+    if (argument == s_standardInput)
+        spool();
+    else
+        requireFile(path_);
+}
+
+InputFile::~InputFile() = default;
+InputFile::InputFile(InputFile&&) noexcept = default;
+
+void InputFile::spool() {
+    std::array<char, 1 << 16> piece;
+    std::size_t size = readInput(piece.data(), piece.size());
+    const std::string_view extension =
+        ZULMetaData::extensionFor(ZULMetaData::streamTypeOfContents({piece.data(), size}));
+    if (extension.empty())
+        throw Failure(
+            fmt::format("{}: standard input begins neither like a movie, nor a RIFF file, nor a stream", name_));
+    const std::string folder = std::filesystem::temp_directory_path().string();
+    temporary_ = std::make_unique<TemporaryFile>(folder, "zulm", std::string(extension));
+    path_ = temporary_->path();
+    const Descriptor file(path_);
+    for (; size > 0; size = readInput(piece.data(), piece.size()))
+        writeAll(file.number(), piece.data(), size);
+    say(fmt::format("{}: standard input is kept in {} meanwhile", name_, path_));
+}
+
+} // namespace Zulm

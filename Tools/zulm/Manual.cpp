@@ -1,0 +1,147 @@
+#include "Tools/zulm/Manual.h"
+
+#include "ZULMetaData/ZULMMetaDataUUIDs.h"
+
+#include <fmt/core.h>
+
+#include <algorithm>
+#include <sstream>
+#include <utility>
+
+namespace Zulm {
+
+namespace {
+
+bool isShown(const CLI::Option* option) {
+    return !option->get_group().empty();
+}
+
+/// Validators append to the type's name.
+std::string valueOf(const CLI::Option& option) {
+    const std::string type = option.get_type_size() == 0 ? std::string() : option.get_type_name();
+    return type.substr(0, type.find(':'));
+}
+
+ManualOption manualOfOption(const CLI::Option& option) {
+    ManualOption entry;
+    entry.isPositional = option.get_positional();
+    if (entry.isPositional)
+        entry.names.push_back(option.get_name(true));
+    for (const std::string& name : option.get_snames())
+        entry.names.push_back("-" + name);
+    for (const std::string& name : option.get_lnames())
+        entry.names.push_back("--" + name);
+    entry.value = entry.isPositional ? std::string() : valueOf(option);
+    entry.description = option.get_description();
+    entry.isRequired = option.get_required();
+    entry.isRepeatable = option.get_expected_max() > 1;
+    return entry;
+}
+
+std::vector<ManualOption> optionsOf(const CLI::App& app) {
+    std::vector<ManualOption> options;
+    for (const CLI::Option* option : app.get_options(isShown))
+        options.push_back(manualOfOption(*option));
+    std::ranges::stable_partition(options, &ManualOption::isPositional);
+    return options;
+}
+
+std::vector<std::string> linesOf(const std::string& text) {
+    std::vector<std::string> lines;
+    std::istringstream stream(text);
+    for (std::string line; std::getline(stream, line);)
+        lines.push_back(line);
+    return lines;
+}
+
+} // namespace
+
+const char* const s_aboutOutput =
+    "Results go to standard output, everything else to standard error. --json, on every command that reports, prints "
+    "one document: {\"schema\": \"zulm.COMMAND\", \"schema_version\": 1, \"tool_version\": ..., \"files\": [...]}. "
+    "Where a file is read, - is standard input. Files that are written appear whole or not at all; one that is there "
+    "already is replaced only with --force.";
+
+const std::vector<ExitCodeMeaning>& exitCodeMeanings() {
+    static const std::vector<ExitCodeMeaning> meanings{
+        {"0", "all is fine"},
+        {"1", "failed: a file could not be read, or a result could not be written"},
+        {"2", "wrong usage: nothing has been done"},
+        {"3", "done, but loss or damage was found"},
+        {"4", "readable, but without recording metadata"},
+        {"128+n", "ended by signal n; unfinished files have been removed"},
+    };
+    return meanings;
+}
+
+std::vector<std::string> ManualOption::choices() const {
+    std::vector<std::string> found;
+    if (value == "KIND")
+        for (const ZULMetaData::MetaDataKind& kind : ZULMetaData::s_metaDataKinds)
+            found.emplace_back(kind.name);
+    if (value.find('|') == std::string::npos)
+        return found;
+    std::istringstream stream(value);
+    for (std::string name; std::getline(stream, name, '|');)
+        found.push_back(name);
+    return found;
+}
+
+std::string ManualCommand::summary() const {
+    return description.substr(0, std::min({description.find(". "), description.find(": "), description.find(" (")}));
+}
+
+std::string ManualCommand::usage() const {
+    std::string line = "zulm " + name + " [OPTIONS]";
+    for (const ManualOption& option : options) {
+        const std::string word = option.isPositional ? option.names.front() : option.names.back() + ' ' + option.value;
+        if (option.isRequired)
+            line += ' ' + word + (option.isPositional && option.isRepeatable ? "..." : "");
+        else if (option.isPositional)
+            line += " [" + word + (option.isRepeatable ? "...]" : "]");
+    }
+    return line;
+}
+
+ManualCommand manualOfCommand(const CLI::App& command) {
+    ManualCommand entry{command.get_name(), command.get_group(), command.get_description(), optionsOf(command),
+                        linesOf(command.get_footer())};
+    std::erase_if(entry.options, [](const ManualOption& option) { return option.names.back() == "--help"; });
+    return entry;
+}
+
+Manual manualOf(const CLI::App& app) {
+    Manual manual{app.get_description(), optionsOf(app), {}, linesOf(app.get_footer())};
+    for (const CLI::App* command : app.get_subcommands([](const CLI::App*) { return true; }))
+        manual.commands.push_back(manualOfCommand(*command));
+    return manual;
+}
+
+std::vector<ManualOption> globalOptions(const Manual& manual) {
+    std::vector<ManualOption> options = manual.options;
+    std::erase_if(options, [](const ManualOption& option) { return option.names.back() == "--version"; });
+    return options;
+}
+
+std::vector<std::string> groupsOf(const Manual& manual) {
+    std::vector<std::string> groups;
+    for (const ManualCommand& command : manual.commands)
+        if (std::ranges::find(groups, command.group) == groups.end())
+            groups.push_back(command.group);
+    return groups;
+}
+
+std::string generated(const Manual& manual, const std::string& format) {
+    using Render = std::string (*)(const Manual&);
+    constexpr std::pair<const char*, Render> renders[]{{"man", manPage},
+                                                       {"markdown", markdownPage},
+                                                       {"bash", bashCompletion},
+                                                       {"zsh", zshCompletion},
+                                                       {"fish", fishCompletion}};
+    for (const auto& [name, render] : renders)
+        if (format == name)
+            return render(manual);
+    return {};
+}
+
+} // namespace Zulm

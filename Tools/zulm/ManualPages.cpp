@@ -1,0 +1,126 @@
+// The manual as a page for man(1) and as one for the documentation.
+
+#include "Tools/zulm/Manual.h"
+
+#include <fmt/core.h>
+#include <fmt/ranges.h>
+
+#include <algorithm>
+
+namespace Zulm {
+
+namespace {
+
+/// As running text of a manual page: nothing in it is a request or an escape.
+std::string roff(const std::string& text) {
+    std::string escaped;
+    for (const char c : text) {
+        if (c == '\\')
+            escaped += "\\e";
+        else if (c == '-')
+            escaped += "\\-";
+        else
+            escaped += c;
+    }
+    return escaped.starts_with(".") || escaped.starts_with("'") ? "\\&" + escaped : escaped;
+}
+
+std::string roffOption(const ManualOption& option) {
+    const char font = option.isPositional ? 'I' : 'B';
+    std::string names;
+    for (const std::string& name : option.names)
+        names += fmt::format("{}\\f{}{}\\fR", names.empty() ? "" : ", ", font, roff(name));
+    const std::string value = option.value.empty() ? "" : " \\fI" + roff(option.value) + "\\fR";
+    return fmt::format(".TP\n{}{}\n{}\n", names, value, roff(option.description));
+}
+
+std::string roffCommand(const ManualCommand& command) {
+    std::string text =
+        fmt::format(".SS {}\n{}.\n.PP\n.B {}\n", command.name, roff(command.description), roff(command.usage()));
+    for (const ManualOption& option : command.options)
+        text += roffOption(option);
+    for (const std::string& example : command.examples)
+        text += fmt::format(".PP\n.EX\n{}\n.EE\n", roff(example));
+    return text;
+}
+
+/// A '|' would divide the cell of a table.
+std::string cell(const std::string& text) {
+    std::string escaped;
+    for (const char c : text)
+        escaped += c == '|' ? "\\|" : std::string(1, c);
+    return escaped;
+}
+
+std::string markdownOptions(const std::vector<ManualOption>& options) {
+    if (options.empty())
+        return {};
+    std::string text = "\n| | |\n| --- | --- |\n";
+    for (const ManualOption& option : options) {
+        std::string names = fmt::format("{}", fmt::join(option.names, ", "));
+        if (!option.value.empty())
+            names += ' ' + option.value;
+        text += fmt::format("| `{}` | {} |\n", cell(names), cell(option.description));
+    }
+    return text;
+}
+
+std::string markdownExamples(const std::vector<std::string>& examples) {
+    return examples.empty() ? std::string() : fmt::format("\n```sh\n{}\n```\n", fmt::join(examples, "\n"));
+}
+
+std::string markdownCommand(const ManualCommand& command) {
+    return fmt::format("\n### {}\n\n{}.\n\n```\n{}\n```\n", command.name, command.description, command.usage()) +
+           markdownOptions(command.options) + markdownExamples(command.examples);
+}
+
+template <class Render>
+std::string eachCommand(const Manual& manual, const std::string& group, Render render) {
+    std::string text;
+    for (const ManualCommand& command : manual.commands)
+        if (command.group == group)
+            text += render(command);
+    return text;
+}
+
+} // namespace
+
+std::string manPage(const Manual& manual) {
+    std::string page =
+        fmt::format(".TH ZULM 1 \"\" \"zulm {}\" \"User Commands\"\n.SH NAME\nzulm \\- metadata of screen "
+                    "recordings\n.SH SYNOPSIS\n.B zulm\n[\\fIOPTIONS\\fR] \\fICOMMAND\\fR ...\n",
+                    ZULM_VERSION);
+    page += fmt::format(".SH DESCRIPTION\n{}\n.PP\n{}\n", roff(manual.description), roff(s_aboutOutput));
+    for (const std::string& group : groupsOf(manual)) {
+        std::string title = group;
+        std::ranges::transform(title, title.begin(),
+                               [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 32) : c; });
+        page += fmt::format(".SH COMMANDS: {}\n", title) + eachCommand(manual, group, roffCommand);
+    }
+    page += ".SH OPTIONS OF EVERY COMMAND\n";
+    for (const ManualOption& option : manual.options)
+        page += roffOption(option);
+    page += ".SH EXIT STATUS\n";
+    for (const auto& [code, meaning] : exitCodeMeanings())
+        page += fmt::format(".TP\n.B {}\n{}\n", code, roff(meaning));
+    page += ".SH ENVIRONMENT\n.TP\n.B NO_COLOR\nwhere set and not empty, nothing is coloured\n.TP\n.B TERM\nnothing is "
+            "coloured where it is dumb\n.TP\n.B TMPDIR\nwhere standard input is kept while it is read\n.SH EXAMPLES\n";
+    for (const std::string& example : manual.examples)
+        page += fmt::format(".PP\n.EX\n{}\n.EE\n", roff(example));
+    return page;
+}
+
+std::string markdownPage(const Manual& manual) {
+    std::string page =
+        fmt::format("# zulm\n\n{}\n{}\n{}\n", manual.description, markdownExamples(manual.examples), s_aboutOutput);
+    page += "\nThis page is made from the tool's own options: `zulm --generate markdown`. The schemas of the JSON "
+            "documents are in [schemas](schemas).\n\n## Exit codes\n\n| code | meaning |\n| --- | --- |\n";
+    for (const auto& [code, meaning] : exitCodeMeanings())
+        page += fmt::format("| {} | {} |\n", code, meaning);
+    page += "\n## Options of every command\n" + markdownOptions(manual.options);
+    for (const std::string& group : groupsOf(manual))
+        page += fmt::format("\n## {}\n", group) + eachCommand(manual, group, markdownCommand);
+    return page;
+}
+
+} // namespace Zulm

@@ -1,0 +1,209 @@
+#include "Tools/zulm/RedactedCopy.h"
+
+#include "Tools/zulm/Progress.h"
+#include "Tools/zulm/TemporaryFile.h"
+#include "ZULMetaData/AtomFormat.h"
+
+#include <fmt/core.h>
+
+#include <algorithm>
+#include <array>
+#include <filesystem>
+#include <fstream>
+#include <limits>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+
+namespace {
+
+constexpr std::size_t s_pieceSize = 1 << 20;
+constexpr std::uint64_t s_most32 = std::numeric_limits<std::uint32_t>::max();
+
+bool isZero(const std::vector<char>& bytes, std::size_t size) {
+    return std::all_of(bytes.begin(), bytes.begin() + static_cast<std::ptrdiff_t>(size),
+                       [](char byte) { return byte == 0; });
+}
+
+/// Appends a part of a file. What is zero is skipped, so that holes stay holes.
+void copyBytes(const ReadBytes& read, std::uint64_t offset, std::uint64_t size, std::ostream& output,
+               Progress& progress) {
+    std::vector<char> piece(s_pieceSize);
+    for (std::uint64_t left = size; left > 0;) {
+        const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(left, piece.size()));
+        const std::size_t got = read(offset + size - left, {piece.data(), wanted});
+        if (got == 0)
+            throw Failure(fmt::format("the input cannot be read at offset {}", offset + size - left));
+        if (isZero(piece, got))
+            output.seekp(static_cast<std::streamoff>(got), std::ios::cur);
+        else
+            output.write(piece.data(), static_cast<std::streamsize>(got));
+        left -= got;
+        progress.advance(got);
+    }
+}
+
+template <std::size_t size>
+void writeBytes(std::ostream& output, const std::array<char, size>& bytes) {
+    output.write(bytes.data(), bytes.size());
+}
+
+/// The file ends where it was written or skipped to.
+void finish(std::ofstream& output, const std::string& path) {
+    const auto end = output.tellp();
+    output.close();
+    if (!output || end < 0)
+        throw Failure(fmt::format("{}: cannot be written", path));
+    std::filesystem::resize_file(path, static_cast<std::uint64_t>(end));
+}
+
+std::uint64_t padded(std::uint64_t size) {
+    return size + size % 2;
+}
+
+} // namespace
+
+RedactedCopy::RedactedCopy(Recording& recording, const Redaction& redaction)
+    : recording_(recording), redaction_(redaction) {
+    std::istream& stream = recording_.parser().getStream();
+    stream.clear();
+    total_ = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+    items_ = listTopLevel(stream, container());
+    if (container() == MetaDataParser::RawStream)
+        return;
+    requireWholeContainer();
+    requireNothingHidden();
+}
+
+void RedactedCopy::requireWholeContainer() {
+    const std::string& name = recording_.name();
+    const bool isMovie = container() == MetaDataParser::QuickTime;
+    const RepairPlan plan = isMovie ? planRepair(recording_.parser().getStream()) : RepairPlan();
+    if (plan.state == RepairPlan::Repairable)
+        throw Failure(fmt::format("{}: {}; 'zulm repair {} -o OUT' mends it first", name, plan.finding, name));
+    const std::uint64_t end = items_.empty() ? 0 : items_.back().end();
+    const bool fillsFile = end == total_ || (!isMovie && padded(end) == total_);
+    if (plan.state == RepairPlan::Unrepairable || !fillsFile)
+        throw Failure(fmt::format("{}: {}; 'zulm salvage {} -o DIR' writes out its streams, which can be redacted one "
+                                  "by one",
+                                  name, plan.finding.empty() ? "its parts do not fill the file" : plan.finding, name));
+}
+
+/// Metadata in a place that is copied as it is would stay in the copy.
+void RedactedCopy::requireNothingHidden() {
+    Progress progress("searching " + recording_.name(), total_);
+    StreamSalvage salvage(recording_.parser().getStream(), container(),
+                          [&progress](std::uint64_t done) { progress.moveTo(done); });
+    const SalvageReport report = salvage.run();
+    if (report.hasMore)
+        throw Failure(fmt::format("{}: has more than {} places that look like streams; not all could be looked into",
+                                  recording_.name(), SalvageReport::s_maximumStreams));
+    for (const SalvagedStream& stream : report.streams) {
+        if (isKept(stream.offset))
+            throw Failure(fmt::format("{}: {} at offset {} is outside of the metadata and would stay in the copy; "
+                                      "'zulm salvage {} -o DIR' shows what it is",
+                                      recording_.name(), nameOf(stream.header.uuid), stream.offset, recording_.name()));
+        unreachable_ += stream.origin == SalvagedStream::Reachable ? 0 : 1;
+    }
+}
+
+bool RedactedCopy::isKept(std::uint64_t offset) const {
+    return std::ranges::none_of(items_, [offset](const ContainerItem& item) {
+        return item.holdsMetaData() && item.offset <= offset && offset < item.end();
+    });
+}
+
+/// Whether something stands behind it whose place may be known to the media.
+bool RedactedCopy::isBeforeMedia(std::size_t item) const {
+    return std::any_of(items_.begin() + static_cast<std::ptrdiff_t>(item), items_.end(),
+                       [](const auto& next) { return !next.holdsMetaData() && !next.holdsRecordingInfo(); });
+}
+
+void RedactedCopy::write(const std::string& output) {
+    const std::string folder = std::filesystem::path(output).parent_path().string();
+    const TemporaryFile streams(folder.empty() ? "." : folder, "streams", ".dat");
+    writeStreams(container() == MetaDataParser::RawStream ? output : streams.path());
+    if (container() == MetaDataParser::QuickTime)
+        writeMovie(output, streams.path());
+    if (container() == MetaDataParser::Riff)
+        writeRIFF(output, streams.path());
+}
+
+void RedactedCopy::writeStreams(const std::string& file) {
+    std::ofstream output(file, std::ios::binary);
+    for (const HeldStream& held : heldStreams(recording_)) {
+        const auto begin = static_cast<std::uint64_t>(output.tellp());
+        const StreamSource source = StreamSource::part(recording_.path(), held.offset, held.present);
+        RedactedStream stream = redactStream(source.open(), redaction_, output);
+        stream.bytesLeftOut += held.declared - held.present;
+        stream.header.uuid = held.type;
+        streams_.push_back(stream);
+        if (stream.removal == RedactedStream::None)
+            parts_.push_back({begin, static_cast<std::uint64_t>(output.tellp()) - begin});
+    }
+    finish(output, file);
+}
+
+void RedactedCopy::writeMovie(const std::string& output, const std::string& streamFile) const {
+    std::ofstream file(output, std::ios::binary);
+    writeItems(file);
+    finish(file, output);
+    std::vector<StreamSource> sources;
+    for (const Part& part : parts_)
+        sources.push_back(StreamSource::part(streamFile, part.offset, part.size));
+    try {
+        if (!sources.empty())
+            SafeMovieSave(output).attach(sources);
+    } catch (const SaveError& error) {
+        throw Failure(fmt::format("{}: the copy cannot be written: {}", recording_.name(), error.sentence()));
+    }
+}
+
+void RedactedCopy::writeRIFF(const std::string& output, const std::string& streamFile) const {
+    std::uint64_t size = 0;
+    for (const Part& part : parts_)
+        size += detail::s_chunkHeaderSize + padded(part.size);
+    if (size > s_most32)
+        throw Failure(fmt::format("{}: {} bytes of metadata are more than a chunk can hold", recording_.name(), size));
+    std::ofstream file(output, std::ios::binary);
+    writeItems(file);
+    std::ifstream streams(streamFile, std::ios::binary);
+    Progress progress("writing the metadata", size);
+    if (!parts_.empty())
+        writeBytes(file, detail::chunkHeader(detail::s_metaDataAtom, static_cast<std::uint32_t>(size)));
+    for (const Part& part : parts_) {
+        writeBytes(file, detail::chunkHeader(detail::s_streamAtom, static_cast<std::uint32_t>(part.size)));
+        copyBytes(readingFrom(streams), part.offset, part.size, file, progress);
+        file.seekp(static_cast<std::streamoff>(part.size % 2), std::ios::cur);
+    }
+    finish(file, output);
+}
+
+/// All but the metadata, which leaves unused bytes where its place may not be given up.
+void RedactedCopy::writeItems(std::ostream& output) const {
+    Progress progress("copying " + recording_.name(), total_);
+    const ReadBytes read = readingFrom(recording_.parser().getStream());
+    for (std::size_t i = 0; i < items_.size(); ++i) {
+        const ContainerItem& item = items_[i];
+        if (!item.holdsMetaData())
+            copyBytes(read, item.offset, item.size, output, progress);
+        else if (isBeforeMedia(i))
+            writeBlank(output, item);
+        if (container() == MetaDataParser::Riff)
+            output.seekp(output.tellp() % 2, std::ios::cur);
+    }
+}
+
+void RedactedCopy::writeBlank(std::ostream& output, const ContainerItem& item) const {
+    const std::streamoff end = output.tellp() + static_cast<std::streamoff>(item.size);
+    if (container() == MetaDataParser::Riff)
+        writeBytes(output, detail::chunkHeader(detail::s_junkChunk, static_cast<std::uint32_t>(item.payloadSize())));
+    else if (item.size > s_most32)
+        writeBytes(output, detail::extendedAtomHeader(detail::s_freeAtom, item.size));
+    else
+        writeBytes(output, detail::atomHeader(detail::s_freeAtom, static_cast<std::uint32_t>(item.size)));
+    output.seekp(end);
+}
+
+} // namespace Zulm

@@ -1,0 +1,126 @@
+#include "Tools/zulm/HeldStreams.h"
+#include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/Progress.h"
+#include "Tools/zulm/Report.h"
+#include "Tools/zulm/StandardStreams.h"
+
+#include <fmt/core.h>
+
+#include <filesystem>
+#include <fstream>
+#include <memory>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+using Json = nlohmann::ordered_json;
+
+namespace {
+
+struct SalvageOptions {
+    std::string file;
+    std::string folder;
+    bool force = false;
+    bool json = false;
+};
+
+const char* originText(SalvagedStream::Origin origin) {
+    switch (origin) {
+    case SalvagedStream::Reachable: return "reachable";
+    case SalvagedStream::Unreachable: return "behind a broken atom";
+    default: return "bare header";
+    }
+}
+
+SalvageReport search(const std::string& path) {
+    std::ifstream file(path, std::ios::binary);
+    Progress progress("searching " + path, std::filesystem::file_size(path));
+    return StreamSalvage(file, MetaDataParser::streamTypeOf(path), [&](std::uint64_t done) { progress.moveTo(done); })
+        .run();
+}
+
+/// Of each kind the best comes first and gets the plain name.
+std::vector<std::string> outputsFor(const std::vector<SalvagedStream>& streams, const std::string& folder) {
+    std::vector<std::string> outputs;
+    std::size_t number = 0;
+    for (std::size_t i = 0; i < streams.size(); ++i) {
+        number = i > 0 && streams[i - 1].header.uuid == streams[i].header.uuid ? number + 1 : 1;
+        outputs.push_back(streamFileIn(folder, streams[i].header.uuid, number));
+    }
+    return outputs;
+}
+
+Json streamDocument(const SalvagedStream& stream, const std::string& output) {
+    return {{"kind", kindDocument(stream.header.uuid)},
+            {"uuid", uuidText(stream.header.uuid)},
+            {"version", stream.header.version},
+            {"found", originText(stream.origin)},
+            {"offset", stream.offset},
+            {"bytes", stream.bytes},
+            {"declared_bytes", stream.declaredBytes ? Json(*stream.declaredBytes) : Json(nullptr)},
+            {"entries", stream.entries},
+            {"cut_short", stream.isCutShort},
+            {"file", output}};
+}
+
+void print(const SalvagedStream& stream, const std::string& output) {
+    writeOutput(fmt::format("{}: {} {}, {} bytes from offset {}, {}{}\n", output, stream.entries,
+                            stream.entries == 1 ? "entry" : "entries", stream.bytes, stream.offset,
+                            originText(stream.origin), stream.isCutShort ? ", cut short" : ""));
+}
+
+bool isWhole(const SalvagedStream& stream) {
+    return stream.origin == SalvagedStream::Reachable && !stream.isCutShort;
+}
+
+ExitCode runSalvage(const SalvageOptions& options) {
+    const InputFile input(options.file);
+    const SalvageReport report = search(input.path());
+    if (report.streams.empty()) {
+        complain(fmt::format("{}: no metadata streams anywhere in it", input.name()));
+        return ExitNoMetaData;
+    }
+    createFolder(options.folder);
+    const std::vector<std::string> outputs = outputsFor(report.streams, options.folder);
+    requireFree(outputs, options.force);
+    Json document = fileHeader(input.name());
+    document["complete"] = !report.hasMore;
+    document["streams"] = Json::array();
+    ExitCode worst = report.hasMore ? ExitDamaged : ExitFine;
+    for (std::size_t i = 0; i < outputs.size(); ++i) {
+        const SalvagedStream& stream = report.streams[i];
+        writePart(input.path(), stream.offset, stream.bytes, outputs[i], options.force);
+        worst = worseOf(worst, isWhole(stream) ? ExitFine : ExitDamaged);
+        document["streams"].push_back(streamDocument(stream, outputs[i]));
+        if (!options.json)
+            print(stream, outputs[i]);
+    }
+    if (options.json)
+        printReport("salvage", Json::array({document}));
+    if (report.hasMore)
+        complain(fmt::format("{}: has more than {} places that look like streams; the rest was not looked into",
+                             input.name(), SalvageReport::s_maximumStreams));
+    return worst;
+}
+
+} // namespace
+
+void addSalvageCommand(CLI::App& app, Action& chosen) {
+    auto options = std::make_shared<SalvageOptions>();
+    CLI::App* command = app.add_subcommand(
+        "salvage", "Search a damaged file for metadata streams, and write what is whole. Ends with 3 where something "
+                   "was out of reach or is cut short");
+    command->add_option("FILE", options->file, "Any file; - is standard input")->required();
+    command
+        ->add_option("-o,--output", options->folder,
+                     "The folder for KIND.dat; of several streams of one kind, the lesser become KIND-2.dat and so on")
+        ->type_name("DIR")
+        ->required();
+    command->add_flag("--force", options->force, "Replace files that exist");
+    command->add_flag("--json", options->json, "Print one JSON document");
+    command->footer("zulm salvage Broken.mp4 -o rescued\n"
+                    "zulm salvage Broken.mp4 -o rescued && zulm attach Copy.mp4 rescued/*.dat -o Whole.mp4");
+    command->callback([options, &chosen] { chosen = [options] { return runSalvage(*options); }; });
+}
+
+} // namespace Zulm

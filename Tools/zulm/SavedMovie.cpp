@@ -1,0 +1,190 @@
+#include "Tools/zulm/SavedMovie.h"
+
+#include "Tools/zulm/OutputFile.h"
+#include "Tools/zulm/Progress.h"
+#include "Tools/zulm/StandardStreams.h"
+#include "ZULMetaData/ZULMMetaDataParser.h"
+
+#include <fmt/core.h>
+
+#include <array>
+#include <csignal>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+using Json = nlohmann::ordered_json;
+
+namespace {
+
+constexpr std::array s_endingSignals{SIGINT, SIGTERM, SIGHUP};
+
+volatile std::sig_atomic_t s_caught = 0;
+
+extern "C" void noteSignal(int signal) {
+    s_caught = signal;
+}
+
+void catchSignals() {
+    s_caught = 0;
+    for (const int signal : s_endingSignals)
+        if (std::signal(signal, noteSignal) == SIG_IGN)
+            std::signal(signal, SIG_IGN);
+}
+
+void releaseSignals() {
+    for (const int signal : s_endingSignals)
+        if (std::signal(signal, SIG_DFL) == SIG_IGN)
+            std::signal(signal, SIG_IGN);
+}
+
+std::string hexText(const std::string& bytes) {
+    std::string text;
+    for (const char byte : bytes)
+        text += fmt::format("{:02x}", static_cast<unsigned char>(byte));
+    return text;
+}
+
+void requireMovieName(const std::string& path) {
+    if (MetaDataParser::streamTypeOf(path) != MetaDataParser::QuickTime)
+        throw Failure(fmt::format("{}: not named as a movie is (.mp4, .mov, .zcap)", path));
+}
+
+void requireRepairable(const std::string& path) {
+    try {
+        const RepairPlan plan = SafeMovieSave(path).plan();
+        if (plan.state == RepairPlan::Unrepairable)
+            throw Failure(unrepairableText(path, plan));
+    } catch (const SaveError& error) {
+        throw Failure(error.what());
+    }
+}
+
+const char* stateText(RepairPlan::State state) {
+    switch (state) {
+    case RepairPlan::Whole: return "whole";
+    case RepairPlan::Repairable: return "repairable";
+    default: return "unrepairable";
+    }
+}
+
+} // namespace
+
+void addSaveOptions(CLI::App& command, SaveOptions& options) {
+    command.add_option("MOVIE", options.movie, "The movie (.mp4, .mov, .zcap)")->required();
+    auto* output = command.add_option("-o,--output", options.output, "Write a changed copy of MOVIE to this file");
+    output->type_name("OUT");
+    command.add_flag("--force", options.force, "Replace OUT where it exists")->needs(output);
+    command.add_flag("--in-place", options.inPlace, "Change MOVIE itself")->excludes(output);
+}
+
+void requireDestination(const SaveOptions& options) {
+    if (options.output.empty() && !options.inPlace)
+        throw CLI::RequiredError("either -o OUT, which writes a changed copy, or --in-place, which changes MOVIE,");
+}
+
+SavedMovie::SavedMovie(const SaveOptions& options, const std::vector<std::string>& otherInputs)
+    : name_(options.inPlace ? options.movie : options.output), subject_(name_), path_(name_) {
+    requireMovie(options.movie);
+    requireMovieName(name_);
+    if (options.inPlace)
+        requireFile(options.movie, true);
+    requireRepairable(options.movie);
+    std::signal(SIGXFSZ, SIG_IGN); // a file that may not grow is a write that fails, and is undone
+    if (options.inPlace)
+        catchSignals();
+    else
+        copy(options, otherInputs);
+}
+
+SavedMovie::~SavedMovie() {
+    if (!copy_)
+        releaseSignals();
+}
+
+SafeMovieSave::Progress SavedMovie::progress(const std::string& what) const {
+    auto shown = std::make_shared<std::unique_ptr<Progress>>();
+    return [what, shown](std::uint64_t done, std::uint64_t total) {
+        if (s_caught != 0)
+            throw Interruption{s_caught};
+        if (!*shown)
+            *shown = std::make_unique<Progress>(what, total);
+        (*shown)->moveTo(done);
+    };
+}
+
+void SavedMovie::copy(const SaveOptions& options, std::vector<std::string> inputs) {
+    inputs.push_back(options.movie);
+    copy_ = std::make_unique<OutputFile>(options.output, inputs, options.force);
+    copy_->copyFrom(options.movie);
+    path_ = copy_->temporaryPath();
+    subject_ = fmt::format("{}, a copy of {}", options.output, options.movie);
+}
+
+void SavedMovie::commit() {
+    if (copy_)
+        copy_->commit();
+}
+
+void SavedMovie::fail(const SaveError& error) const {
+    std::string text = fmt::format("{}: {}", error.file() == path_ ? subject_ : error.file(), error.sentence());
+    if (error.reason() == SaveError::Reason::KindExists)
+        text += "; --replace puts another one in front of it";
+    if (error.reason() != SaveError::Reason::NotUndone)
+        text += copy_ ? "; nothing was written" : "; nothing was changed";
+    throw Failure(text);
+}
+
+/// What was done is undone by now.
+void SavedMovie::endBy(const Interruption& interruption) const {
+    complain(fmt::format("{}: interrupted; it is what it was before", name_));
+    std::signal(interruption.signal, SIG_DFL);
+    std::raise(interruption.signal);
+    throw Failure(fmt::format("{}: interrupted", name_));
+}
+
+void requireMovie(const std::string& path) {
+    requireFile(path);
+    requireMovieName(path);
+}
+
+std::string unrepairableText(const std::string& path, const RepairPlan& plan) {
+    return fmt::format("{}: {}; nothing that is put behind it could be found. 'zulm salvage {} -o DIR' writes out "
+                       "what metadata there is",
+                       path, plan.finding, path);
+}
+
+void printRepair(const std::string& path, const RepairPlan& plan) {
+    if (plan.state == RepairPlan::Whole)
+        return;
+    writeOutput(fmt::format("{}: {}\n", path, plan.finding));
+    for (const RepairChange& change : plan.changes)
+        writeOutput(fmt::format("  offset {}: {} -> {}  {}\n", change.offset, hexText(change.before),
+                                change.after.empty() ? "(cut off)" : hexText(change.after), change.reason));
+}
+
+Json repairDocument(const RepairPlan& plan) {
+    Json document{{"state", stateText(plan.state)}, {"changes", Json::array()}};
+    for (const RepairChange& change : plan.changes)
+        document["changes"].push_back({{"offset", change.offset},
+                                       {"before", hexText(change.before)},
+                                       {"after", hexText(change.after)},
+                                       {"reason", change.reason}});
+    if (plan.state == RepairPlan::Whole)
+        return document;
+    document["finding"] = plan.finding;
+    document["offset"] = plan.offset;
+    document["loss"] = plan.hasLoss;
+    return document;
+}
+
+ExitCode complainAboutLoss(const std::string& path, const RepairPlan& plan) {
+    if (!plan.hasLoss)
+        return ExitFine;
+    complain(fmt::format("{}: {}; part of it never got into the movie. 'zulm salvage {} -o DIR' writes out what "
+                         "can be found",
+                         path, plan.finding, path));
+    return ExitDamaged;
+}
+
+} // namespace Zulm

@@ -1,0 +1,89 @@
+#pragma once
+
+// What the commands that change a movie share: whether they change it in place or a copy of it, the repair that comes
+// first, and how all of it is said.
+
+#include "Tools/zulm/Command.h"
+#include "ZULMetaDataBridge/Source/SafeMovieSave.h"
+
+#include <nlohmann/json.hpp>
+
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace Zulm {
+
+class OutputFile;
+
+struct SaveOptions {
+    std::string movie;
+    std::string output;
+    bool force = false;
+    bool inPlace = false;
+};
+
+/// Adds MOVIE, -o, --force and --in-place.
+void addSaveOptions(CLI::App& command, SaveOptions& options);
+
+/// Throws the usage error where it is left open which file is written.
+void requireDestination(const SaveOptions& options);
+
+/// The movie that a command works on: a copy that takes its place when it is committed, or the movie itself. While
+/// the movie itself is changed, a signal undoes that before it ends the program.
+class SavedMovie {
+public:
+    /// Throws `Failure` for what is no movie or cannot be repaired, and where the output is one of the inputs.
+    SavedMovie(const SaveOptions& options, const std::vector<std::string>& otherInputs);
+    ~SavedMovie();
+    SavedMovie(const SavedMovie&) = delete;
+    SavedMovie& operator=(const SavedMovie&) = delete;
+
+    /// The file that the result is in.
+    const std::string& name() const { return name_; }
+
+    /// Gives what `work` makes of the movie's `SafeMovieSave`, and puts the copy in place. Throws `Failure`.
+    template <class Work>
+    auto save(const std::string& what, Work work) {
+        try {
+            const auto result = work(ZULMetaData::SafeMovieSave(path_, progress(what)));
+            commit();
+            return result;
+        } catch (const ZULMetaData::SaveError& error) {
+            fail(error);
+        } catch (const Interruption& interruption) {
+            endBy(interruption);
+        }
+    }
+
+private:
+    struct Interruption {
+        int signal;
+    };
+
+    ZULMetaData::SafeMovieSave::Progress progress(const std::string& what) const;
+    void copy(const SaveOptions& options, std::vector<std::string> inputs);
+    void commit();
+    [[noreturn]] void fail(const ZULMetaData::SaveError& error) const;
+    [[noreturn]] void endBy(const Interruption& interruption) const;
+
+    std::string name_;
+    std::string subject_; ///< what messages call it
+    std::string path_;    ///< of what is written to
+    std::unique_ptr<OutputFile> copy_;
+};
+
+/// Throws `Failure` unless `path` is a movie, by its name, that can be opened.
+void requireMovie(const std::string& path);
+
+/// "PATH: the atom ... has an open end; ...", with what to run next.
+std::string unrepairableText(const std::string& path, const ZULMetaData::RepairPlan& plan);
+
+/// What a repair changes, or has changed: one line for the finding and one for every change.
+void printRepair(const std::string& path, const ZULMetaData::RepairPlan& plan);
+nlohmann::ordered_json repairDocument(const ZULMetaData::RepairPlan& plan);
+
+/// Complains where an interrupted append lost something. Gives how the command ends.
+ExitCode complainAboutLoss(const std::string& path, const ZULMetaData::RepairPlan& plan);
+
+} // namespace Zulm

@@ -1,0 +1,65 @@
+#include "Tools/zulm/StandardStreams.h"
+
+#include "Tools/zulm/Command.h"
+#include "Tools/zulm/Settings.h"
+
+#include <fmt/color.h>
+#include <fmt/core.h>
+
+#include <array>
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <fcntl.h>
+#include <system_error>
+#include <unistd.h>
+
+namespace Zulm {
+
+namespace {
+
+std::array<char, 1 << 16> s_outputBuffer;
+
+/// Whether output failed because nobody is there to read it.
+bool isNobodyThere(int error) {
+    return error == EPIPE || error == EBADF;
+}
+
+} // namespace
+
+void secureStandardStreams() {
+    struct Stream {
+        int descriptor;
+        int mode; // the wrong one for the two that matter: using them must fail
+    };
+    for (const Stream stream : {Stream{STDIN_FILENO, O_WRONLY}, {STDOUT_FILENO, O_RDONLY}, {STDERR_FILENO, O_WRONLY}})
+        if (fcntl(stream.descriptor, F_GETFD) < 0)
+            if (open("/dev/null", stream.mode) != stream.descriptor)
+                std::abort(); // the lowest free number is the one that is missing
+    std::setvbuf(stdout, s_outputBuffer.data(), isTerminal(stdout) ? _IOLBF : _IOFBF, s_outputBuffer.size());
+}
+
+bool flushStandardOutput() {
+    errno = 0;
+    if (std::fflush(stdout) == 0)
+        return true;
+    complainAboutOutput(errno);
+    return false;
+}
+
+void complainAboutOutput(int error) {
+    if (!isNobodyThere(error))
+        complain(fmt::format("standard output: cannot be written: {}", std::strerror(error)));
+}
+
+void writeOutput(std::string_view bytes) {
+    if (std::fwrite(bytes.data(), 1, bytes.size(), stdout) != bytes.size())
+        throw std::system_error(errno, std::generic_category(), "standard output");
+}
+
+std::string heading(const std::string& text) {
+    return useColor(stdout) ? fmt::format(fmt::emphasis::bold, "{}", text) : text;
+}
+
+} // namespace Zulm

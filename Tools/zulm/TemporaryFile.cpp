@@ -1,0 +1,82 @@
+#include "Tools/zulm/TemporaryFile.h"
+
+#include <fmt/core.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <csignal>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <sys/stat.h>
+#include <system_error>
+#include <unistd.h>
+
+namespace Zulm {
+
+namespace {
+
+/// What a signal must remove: a handler can neither lock nor allocate.
+struct Slot {
+    volatile std::sig_atomic_t isUsed = 0;
+    std::array<char, 4096> path{};
+};
+
+std::array<Slot, 4> s_slots;
+
+extern "C" void removeTemporariesAndEnd(int signal) {
+    for (const Slot& slot : s_slots)
+        if (slot.isUsed)
+            unlink(slot.path.data());
+    std::signal(signal, SIG_DFL);
+    std::raise(signal);
+}
+
+void watchSignals() {
+    for (const int signal : {SIGINT, SIGTERM, SIGHUP, SIGPIPE, SIGXFSZ})
+        if (std::signal(signal, removeTemporariesAndEnd) == SIG_IGN)
+            std::signal(signal, SIG_IGN);
+}
+
+void remember(const std::string& path) {
+    const auto slot = std::ranges::find_if(s_slots, [](const Slot& candidate) { return !candidate.isUsed; });
+    if (slot == s_slots.end() || path.size() >= slot->path.size())
+        return;
+    std::memcpy(slot->path.data(), path.c_str(), path.size() + 1);
+    slot->isUsed = 1;
+    watchSignals();
+}
+
+void forget(const std::string& path) {
+    for (Slot& slot : s_slots)
+        if (slot.isUsed && path == slot.path.data())
+            slot.isUsed = 0;
+}
+
+} // namespace
+
+TemporaryFile::TemporaryFile(const std::string& folder, const std::string& name, const std::string& extension)
+    : path_((std::filesystem::path(folder) / fmt::format(".{}.XXXXXX{}", name, extension)).string()) {
+    const int file = mkstemps(path_.data(), static_cast<int>(extension.size()));
+    if (file < 0)
+        throw std::system_error(errno, std::generic_category(), path_);
+    const mode_t mask = umask(0);
+    umask(mask);
+    fchmod(file, 0666 & ~mask);
+    close(file);
+    remember(path_);
+}
+
+TemporaryFile::~TemporaryFile() {
+    if (!isReleased_)
+        unlink(path_.c_str());
+    forget(path_);
+}
+
+void TemporaryFile::release() {
+    isReleased_ = true;
+    forget(path_);
+}
+
+} // namespace Zulm

@@ -1,0 +1,68 @@
+#include "Tools/zulm/Text.h"
+
+#include "ZULMetaDataBridge/ZULMetaDataBridge.h"
+
+#include <fmt/core.h>
+#include <nlohmann/json.hpp>
+
+#include <cstdint>
+
+namespace Zulm {
+
+namespace {
+
+std::string escaped(char byte) {
+    return fmt::format("\\x{:02x}", static_cast<unsigned char>(byte));
+}
+
+/// Of the control characters U+0080 to U+009F, which take two bytes.
+bool isUpperControl(std::string_view bytes) {
+    return bytes.size() > 1 && bytes[0] == '\xc2' && static_cast<unsigned char>(bytes[1]) < 0xa0;
+}
+
+} // namespace
+
+std::string printable(std::string_view bytes) {
+    std::string text;
+    for (const char c : bytes)
+        text += c >= ' ' && c <= '~' && c != '\\' ? std::string(1, c) : escaped(c);
+    return text;
+}
+
+std::string shown(const std::string& text) {
+    std::string result;
+    const std::string valid = validText(text);
+    for (std::size_t i = 0; i < valid.size(); ++i) {
+        const bool isControl = (valid[i] >= '\0' && valid[i] < ' ') || valid[i] == '\x7f';
+        if (isUpperControl(std::string_view(valid).substr(i))) {
+            result += escaped(valid[i + 1]);
+            ++i;
+        } else {
+            result += isControl ? escaped(valid[i]) : std::string(1, valid[i]);
+        }
+    }
+    return result;
+}
+
+std::string validText(const std::string& bytes) {
+    using Json = nlohmann::json;
+    if (ZULMetaData::isUTF8(bytes))
+        return bytes;
+    return Json::parse(Json(bytes).dump(-1, ' ', false, Json::error_handler_t::replace)).get<std::string>();
+}
+
+std::string base64(std::string_view bytes) {
+    constexpr auto digits = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
+    std::string text;
+    for (std::size_t i = 0; i < bytes.size(); i += 3) {
+        const std::string_view group = bytes.substr(i, 3);
+        std::uint32_t bits = 0;
+        for (std::size_t j = 0; j < 3; ++j)
+            bits = bits << 8 | (j < group.size() ? static_cast<unsigned char>(group[j]) : 0U);
+        for (std::size_t j = 0; j < 4; ++j)
+            text += j <= group.size() ? digits[bits >> (18 - 6 * j) & 0x3f] : '=';
+    }
+    return text;
+}
+
+} // namespace Zulm

@@ -1,0 +1,132 @@
+#include "Tools/zulm/Command.h"
+#include "Tools/zulm/Findings.h"
+#include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/Recording.h"
+#include "Tools/zulm/Report.h"
+#include "Tools/zulm/StandardStreams.h"
+
+#include <fmt/core.h>
+
+#include <algorithm>
+#include <memory>
+#include <stdexcept>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+using Json = nlohmann::ordered_json;
+
+namespace {
+
+struct VerifyOptions {
+    std::vector<std::string> files;
+    bool json = false;
+};
+
+/// Nothing else may open the file first: it is not known to be safe.
+ValidationReport validate(const InputFile& input) {
+    try {
+        return validateRecording(input.path());
+    } catch (const std::runtime_error& error) {
+        throw Failure(fmt::format("{}: {}", input.name(), error.what()));
+    }
+}
+
+ExitCode exitCodeFor(const ValidationReport& report) {
+    if (report.isDamaged())
+        return ExitDamaged;
+    return report.hasMetaData() ? ExitFine : ExitNoMetaData;
+}
+
+std::string counted(std::uint64_t count, const char* one, const char* many) {
+    return fmt::format("{} {}", count, count == 1 ? one : many);
+}
+
+void print(const std::string& name, const ValidationReport& report) {
+    const auto findings = report.allFindings();
+    for (const Finding& finding : findings)
+        writeOutput(fmt::format("{}: {}\n", name, findingText(finding)));
+    if (const std::uint64_t unlisted = report.damageCount + report.noticeCount - findings.size(); unlisted > 0)
+        writeOutput(
+            fmt::format("{}: {} not listed\n", name, counted(unlisted, "more finding is", "more findings are")));
+    if (!report.isDamaged() && report.hasMetaData())
+        writeOutput(fmt::format("{}: ok ({}, {})\n", name, counted(report.streamCount, "stream", "streams"),
+                                counted(report.wholeEntries, "entry", "entries")));
+    else if (!report.isDamaged())
+        writeOutput(fmt::format("{}: no recording metadata\n", name));
+}
+
+Json findingDocuments(const std::vector<Finding>& findings) {
+    Json documents = Json::array();
+    for (const Finding& finding : findings)
+        documents.push_back(findingDocument(finding));
+    return documents;
+}
+
+Json streamDocument(const StreamReport& stream) {
+    return {{"kind", kindDocument(stream.type)},
+            {"uuid", uuidText(stream.type)},
+            {"version", stream.version},
+            {"fixed_entry_size", stream.fixedEntrySize},
+            {"offset", stream.offset},
+            {"declared_bytes", stream.declaredBytes},
+            {"present_bytes", stream.presentBytes},
+            {"readable_bytes", stream.readableBytes},
+            {"entries", stream.wholeEntries},
+            {"first_time", numberDocument(stream.firstTime)},
+            {"last_time", numberDocument(stream.lastTime)},
+            {"reachable", stream.isReachable},
+            {"findings", findingDocuments(stream.findings)}};
+}
+
+Json fileDocument(const std::string& name, const ValidationReport& report) {
+    Json document = fileHeader(name);
+    document.update(Json{{"container", containerName(report.container)},
+                         {"bytes", report.bytes},
+                         {"damaged", report.isDamaged()},
+                         {"damage_count", report.damageCount},
+                         {"notice_count", report.noticeCount},
+                         {"stream_count", report.streamCount},
+                         {"entries", report.wholeEntries},
+                         {"findings", findingDocuments(report.findings)},
+                         {"streams", Json::array()}});
+    for (const StreamReport& stream : report.streams)
+        document["streams"].push_back(streamDocument(stream));
+    return document;
+}
+
+/// What to run next.
+void advise(const std::string& name, const ValidationReport& report) {
+    if (std::ranges::any_of(report.findings, [](const Finding& f) { return f.code == FindingCode::OpenEndedAtom; }))
+        warn(fmt::format("{}: 'zulm repair --dry-run {}' says whether its last atom can be closed", name, name));
+}
+
+ExitCode runVerify(const VerifyOptions& options) {
+    Json files = Json::array();
+    const ExitCode code = forEachFile(options.files, [&](const std::string& path) {
+        const InputFile input(path);
+        const ValidationReport report = validate(input);
+        if (options.json)
+            files.push_back(fileDocument(input.name(), report));
+        else
+            print(input.name(), report);
+        advise(input.name(), report);
+        return exitCodeFor(report);
+    });
+    if (options.json)
+        printReport("verify", std::move(files));
+    return code;
+}
+
+} // namespace
+
+void addVerifyCommand(CLI::App& app, Action& chosen) {
+    auto options = std::make_shared<VerifyOptions>();
+    CLI::App* command = app.add_subcommand("verify", "Walk every byte of the metadata and say what is damaged where");
+    command->add_option("FILE", options->files, "Movies, RIFF files or stream files; - is standard input")->required();
+    command->add_flag("--json", options->json, "Print one JSON document");
+    command->footer("zulm verify Recording.mp4\nzulm verify --json *.mp4");
+    command->callback([options, &chosen] { chosen = [options] { return runVerify(*options); }; });
+}
+
+} // namespace Zulm

@@ -1,0 +1,38 @@
+#pragma once
+
+// What must change in a movie so that its atoms fill the file, and what is appended to it can be found. Nothing is
+// written here; `SafeMovieSave` carries a plan out.
+//
+// Mended are a last atom with an open end, an append that was interrupted, and a movie that
+// `Util::finalizeAtomsInFile` left 8 bytes short. Nothing is changed where two readings are possible.
+
+#include <cstdint>
+#include <istream>
+#include <string>
+#include <vector>
+
+namespace ZULMetaData {
+
+/// Bytes of a movie that a repair replaces.
+struct RepairChange {
+    std::uint64_t offset = 0;
+    std::string before;
+    std::string after;  ///< as long as `before`; or empty, where the file's last bytes are cut off
+    std::string reason; ///< one sentence
+};
+
+struct RepairPlan {
+    enum State : std::int32_t { Whole, Repairable, Unrepairable };
+
+    State state = Whole;
+    std::vector<RepairChange> changes; ///< each must be on the disk before the next is made
+    std::string finding;               ///< what is wrong, in one sentence; empty where nothing is
+    std::uint64_t offset = 0;          ///< of the atom that is wrong
+    bool hasLoss = false;              ///< part of an interrupted append never got into the movie
+};
+
+/// Reads the headers of the movie's atoms, and the entries of a stream whose append was interrupted. Clears the
+/// stream's state first.
+RepairPlan planRepair(std::istream& movie);
+
+} // namespace ZULMetaData

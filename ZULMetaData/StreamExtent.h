@@ -1,0 +1,43 @@
+#pragma once
+
+// How much of a metadata stream is whole: its header and the entries in front of the first one that is cut short.
+// Bounded by the bytes that are there, whatever sizes they declare, and in constant memory.
+
+#include "ZULMetaData/ZULMMetaDataUUIDs.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <functional>
+#include <istream>
+#include <optional>
+#include <span>
+
+namespace ZULMetaData {
+
+struct StreamExtent {
+    /// What stands behind the last whole entry.
+    enum End : std::int32_t {
+        AtEntry,     ///< nothing
+        InsideEntry, ///< an entry whose end is missing, its size field included
+        EmptyEntry,  ///< an entry that declares no bytes, where each carries its size: no reader gets past it
+    };
+
+    MetaDataHeader header;
+    std::uint64_t wholeBytes = 0; ///< header included
+    std::uint64_t entries = 0;
+    End end = AtEntry;
+};
+
+/// Gives how many bytes it read: fewer than asked for only where there are no more.
+using ReadBytes = std::function<std::size_t(std::uint64_t position, std::span<char> bytes)>;
+
+/// Walks the `length` bytes of a stream. None where they do not hold a stream's header.
+std::optional<StreamExtent> measureStream(const ReadBytes& read, std::uint64_t length);
+
+/// The same for `length` bytes from `offset` on. Clears the input's state first.
+std::optional<StreamExtent> measureStream(std::istream& input, std::uint64_t offset, std::uint64_t length);
+
+/// What `input` holds, to be read at any position. Uses an input of the caller, which must outlive it.
+ReadBytes readingFrom(std::istream& input);
+
+} // namespace ZULMetaData

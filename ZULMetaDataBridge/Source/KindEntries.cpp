@@ -1,0 +1,40 @@
+#include "ZULMetaDataBridge/Source/KindEntries.h"
+
+#include "ZULMetaData/ZULMMetaDataWriter.h"
+
+#include <utility>
+
+namespace ZULMetaData {
+
+bool isDecodable(const MetaDataHeader& header) {
+    const MetaDataKind* kind = findMetaDataKind(header.uuid);
+    return kind && header.version >= 1 && header.version <= kind->currentVersion &&
+           RecordedKinds::visit(header.uuid, []<class Kind>() {});
+}
+
+std::uint32_t entrySizeOf(const MetaDataHeader& header) {
+    std::uint32_t size = header.fixedEntrySize;
+    if (isDecodable(header))
+        RecordedKinds::visit(header.uuid,
+                             [&size]<class Kind>() { size = metaDataFixedEntrySize<typename Kind::Value>(); });
+    return size;
+}
+
+StreamEntries entriesOf(ReadBytes read, std::uint64_t length) {
+    StreamEntries entries(std::move(read), length);
+    if (entries.header())
+        entries.setEntrySize(entrySizeOf(*entries.header()));
+    return entries;
+}
+
+std::optional<double> timeOfEntry(const MetaDataHeader& header, std::string_view bytes) {
+    std::optional<double> time;
+    if (isDecodable(header))
+        RecordedKinds::visit(header.uuid, [&]<class Kind>() {
+            if (const auto decoded = decodeEntry<typename Kind::Value>(bytes, header.version))
+                time = decoded->time;
+        });
+    return time;
+}
+
+} // namespace ZULMetaData

@@ -1,0 +1,50 @@
+#include "ZULMetaDataBridge/Source/MovieTransaction.h"
+
+#include "ZULMetaData/AtomFormat.h"
+
+#include <ranges>
+
+namespace ZULMetaData {
+
+MovieTransaction::MovieTransaction(const FileLocation& movie) : file_(movie), oldSize_(file_.size()), end_(oldSize_) {}
+
+void MovieTransaction::apply(const std::vector<RepairChange>& changes) {
+    for (const RepairChange& change : changes) {
+        applied_.push_back(change);
+        if (change.after.empty())
+            file_.truncate(end_ = change.offset);
+        else
+            file_.writeAt(change.offset, change.after);
+        file_.sync();
+    }
+}
+
+void MovieTransaction::beginAtom(std::uint32_t type) {
+    atomStart_ = end_;
+    append(detail::extendedAtomHeader(type, 0));
+}
+
+void MovieTransaction::append(std::span<const char> bytes) {
+    file_.writeAt(end_, bytes);
+    end_ += bytes.size();
+}
+
+std::uint64_t MovieTransaction::endAtom() {
+    const std::uint64_t size = end_ - atomStart_;
+    file_.sync();
+    file_.writeAt(atomStart_ + detail::s_extendedSizeOffset, detail::bigEndianBytes(size));
+    file_.sync();
+    return size;
+}
+
+void MovieTransaction::undo() {
+    file_.truncate(oldSize_);
+    file_.sync(); // an open end put back too early would swallow what is still behind it
+    for (const RepairChange& change : applied_ | std::views::reverse)
+        file_.writeAt(change.offset, change.before);
+    file_.sync();
+    applied_.clear();
+    end_ = oldSize_;
+}
+
+} // namespace ZULMetaData

@@ -1,0 +1,45 @@
+#pragma once
+
+// Changes to a movie that can all be undone: bytes that are replaced, and atoms that are appended.
+
+#include "Platform/DurableFile.h"
+#include "ZULMetaData/RepairPlan.h"
+
+#include <cstdint>
+#include <optional>
+#include <span>
+#include <vector>
+
+namespace ZULMetaData {
+
+/// Throws `std::system_error` as `DurableFile` does. Undoes nothing of its own accord.
+class MovieTransaction {
+public:
+    explicit MovieTransaction(const FileLocation& movie);
+
+    /// Where the movie ends, and the next bytes go.
+    std::uint64_t end() const { return end_; }
+
+    /// Returns when all of them are on the disk, one after the other.
+    void apply(const std::vector<RepairChange>& changes);
+
+    /// Writes an atom's header at the end. Its size stays 0 until `endAtom`, so that whatever happens in between, a
+    /// repair finds out how far it got.
+    void beginAtom(std::uint32_t type);
+    void append(std::span<const char> bytes);
+
+    /// Returns when the atom's bytes, and after them its size, are on the disk. Gives that size.
+    std::uint64_t endAtom();
+
+    /// Makes the movie byte for byte what it was.
+    void undo();
+
+private:
+    DurableFile file_;
+    std::uint64_t oldSize_;
+    std::uint64_t end_;
+    std::uint64_t atomStart_ = 0;
+    std::vector<RepairChange> applied_;
+};
+
+} // namespace ZULMetaData

@@ -1,0 +1,275 @@
+#include "ZULMetaDataBridge/Source/SafeMovieSave.h"
+
+#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/RecordingInfo.h"
+#include "ZULMetaData/ZULMMetaDataParser.h"
+#include "ZULMetaDataBridge/Source/MovieTransaction.h"
+#include "ZULMetaDataBridge/Source/ZULRAtomWriter.h"
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <cstring>
+#include <fstream>
+#include <memory>
+#include <sstream>
+#include <system_error>
+#include <utility>
+
+namespace ZULMetaData {
+
+namespace {
+
+constexpr std::size_t s_pieceSize = 1 << 18;
+
+std::string kindText(const uuid& type) {
+    if (const MetaDataKind* kind = findMetaDataKind(type))
+        return std::string(kind->name);
+    std::ostringstream text;
+    text << type;
+    return text.str();
+}
+
+std::ifstream openMovie(const FileLocation& movie) {
+    std::ifstream file;
+    errno = 0;
+    fileOpen(file, utf8Path(movie).c_str(), std::ios_base::binary);
+    if (!file.is_open())
+        throw SaveError(utf8Path(movie), std::string("cannot be opened: ") + std::strerror(errno));
+    return file;
+}
+
+std::unique_ptr<MetaDataParser> parserOver(std::ifstream& movie) {
+    return MetaDataParser::create(movie, MetaDataParser::QuickTime);
+}
+
+/// A stream that was found worth attaching.
+struct Candidate {
+    AttachedStream stream;
+    StreamSource::Bytes source;
+};
+
+Candidate examine(const StreamSource& source) {
+    Candidate candidate{{}, source.open()};
+    const auto extent = measureStream(candidate.source.read, candidate.source.length);
+    if (!extent)
+        throw SaveError(source.name(), "too short for a stream: " + std::to_string(candidate.source.length) +
+                                           " bytes of a " + std::to_string(s_metaDataHeaderSize) + "-byte header");
+    candidate.stream = {source.name(),      extent->header.uuid, 0,
+                        extent->wholeBytes, extent->entries,     candidate.source.length - extent->wholeBytes,
+                        extent->end};
+    return candidate;
+}
+
+std::vector<Candidate> examine(const std::vector<StreamSource>& sources) {
+    std::vector<Candidate> candidates;
+    for (const StreamSource& source : sources) {
+        try {
+            candidates.push_back(examine(source));
+        } catch (const std::system_error& error) {
+            throw SaveError(source.name(), error.what());
+        }
+        const auto& added = candidates.back().stream;
+        const auto first = std::ranges::find(candidates, added.type, [](const auto& c) { return c.stream.type; });
+        if (&first->stream != &added)
+            throw SaveError(added.name,
+                            "a second stream of the kind " + kindText(added.type) + ", beside " + first->stream.name);
+    }
+    return candidates;
+}
+
+/// One save of one movie, from its repair to what is read back.
+class Save {
+public:
+    Save(const FileLocation& movie, const SafeMovieSave::Progress& progress)
+        : movie_(movie), progress_(progress), transaction_(movie) {}
+
+    RepairPlan repair();
+    AttachResult attach(std::vector<Candidate>& candidates, SafeMovieSave::Existing existing);
+    StampResult stamp(const ZCAPHeader& info);
+
+    /// Runs `work`, and undoes what it did where it throws.
+    template <class Work>
+    auto orUndo(Work work) {
+        try {
+            return work(*this);
+        } catch (const std::exception& failure) {
+            undo(failure.what());
+            throw;
+        } catch (...) {
+            undo("stopped");
+            throw;
+        }
+    }
+
+private:
+    [[noreturn]] void fail(const std::string& sentence, SaveError::Reason reason = SaveError::Reason::Failed) const {
+        throw SaveError(utf8Path(movie_), sentence, reason);
+    }
+
+    void refuseExisting(const std::vector<Candidate>& candidates) const;
+    void write(Candidate& candidate);
+    void verify(const std::vector<Candidate>& candidates);
+    void compare(std::ifstream& movie, const Candidate& candidate);
+    void read(const Candidate& candidate, std::uint64_t position, std::span<char> bytes) const;
+    void undo(const std::string& reason);
+    void advance(std::uint64_t bytes);
+
+    FileLocation movie_;
+    SafeMovieSave::Progress progress_;
+    MovieTransaction transaction_;
+    std::uint64_t done_ = 0;
+    std::uint64_t total_ = 0;
+};
+
+RepairPlan Save::repair() {
+    std::ifstream movie = openMovie(movie_);
+    RepairPlan plan = planRepair(movie);
+    if (transaction_.end() == 0)
+        fail("is empty");
+    if (plan.state == RepairPlan::Unrepairable)
+        fail(plan.finding);
+    transaction_.apply(plan.changes);
+    return plan;
+}
+
+void Save::refuseExisting(const std::vector<Candidate>& candidates) const {
+    std::ifstream movie = openMovie(movie_);
+    const auto parser = parserOver(movie);
+    for (const Candidate& candidate : candidates)
+        if (const auto range = parser->fileDataForUUID(candidate.stream.type); range.offset != 0)
+            fail("has a stream of the kind " + kindText(candidate.stream.type) + " already, at offset " +
+                     std::to_string(range.offset),
+                 SaveError::Reason::KindExists);
+}
+
+void Save::advance(std::uint64_t bytes) {
+    done_ += bytes;
+    if (progress_)
+        progress_(done_, total_);
+}
+
+void Save::read(const Candidate& candidate, std::uint64_t position, std::span<char> bytes) const {
+    if (candidate.source.read(position, bytes) != bytes.size())
+        throw SaveError(candidate.stream.name, "cannot be read at offset " + std::to_string(position));
+}
+
+/// Calls `visit` with the position and size of every piece of a stream.
+template <class Visit>
+void inPieces(std::uint64_t length, Visit visit) {
+    for (std::uint64_t position = 0; position < length; position += s_pieceSize)
+        visit(position, static_cast<std::size_t>(std::min<std::uint64_t>(s_pieceSize, length - position)));
+}
+
+void Save::write(Candidate& candidate) {
+    const std::uint64_t length = candidate.stream.bytes;
+    transaction_.append(detail::extendedAtomHeader(detail::s_streamAtom, detail::s_extendedAtomHeaderSize + length));
+    candidate.stream.offset = transaction_.end();
+    std::vector<char> piece(s_pieceSize);
+    inPieces(length, [&](std::uint64_t position, std::size_t size) {
+        const std::span<char> bytes(piece.data(), size);
+        read(candidate, position, bytes);
+        transaction_.append(bytes);
+        advance(size);
+    });
+}
+
+void Save::compare(std::ifstream& movie, const Candidate& candidate) {
+    const ReadBytes readMovie = readingFrom(movie);
+    std::vector<char> expected(s_pieceSize);
+    std::vector<char> found(s_pieceSize);
+    inPieces(candidate.stream.bytes, [&](std::uint64_t position, std::size_t size) {
+        read(candidate, position, {expected.data(), size});
+        if (readMovie(candidate.stream.offset + position, {found.data(), size}) != size ||
+            std::memcmp(expected.data(), found.data(), size) != 0)
+            fail("does not hold what was written at offset " + std::to_string(candidate.stream.offset + position));
+        advance(size);
+    });
+}
+
+void Save::verify(const std::vector<Candidate>& candidates) {
+    std::ifstream movie = openMovie(movie_);
+    const auto parser = parserOver(movie);
+    for (const Candidate& candidate : candidates) {
+        const auto range = parser->fileDataForUUID(candidate.stream.type);
+        if (range.offset != candidate.stream.offset || range.length != candidate.stream.bytes)
+            fail("does not show its stream of the kind " + kindText(candidate.stream.type) + " at offset " +
+                 std::to_string(candidate.stream.offset) + " to a reader");
+        compare(movie, candidate);
+    }
+}
+
+AttachResult Save::attach(std::vector<Candidate>& candidates, SafeMovieSave::Existing existing) {
+    AttachResult result{repair(), {}};
+    if (existing == SafeMovieSave::Existing::Refuse)
+        refuseExisting(candidates);
+    for (const Candidate& candidate : candidates)
+        total_ += 2 * candidate.stream.bytes; // written, and read back
+    transaction_.beginAtom(detail::s_metaDataAtom);
+    for (Candidate& candidate : candidates)
+        write(candidate);
+    transaction_.endAtom();
+    verify(candidates);
+    for (Candidate& candidate : candidates)
+        result.streams.push_back(std::move(candidate.stream));
+    return result;
+}
+
+StampResult Save::stamp(const ZCAPHeader& info) {
+    StampResult result{repair(), {}};
+    transaction_.beginAtom(detail::s_recordingInfoAtom);
+    transaction_.append({reinterpret_cast<const char*>(&info), sizeof info});
+    transaction_.endAtom();
+    std::ifstream movie = openMovie(movie_);
+    const auto infos = readRecordingInfo(*parserOver(movie));
+    if (infos.empty() || std::memcmp(&infos.back(), &info, sizeof info) != 0)
+        fail("does not show its recording info to a reader");
+    result.info = infos.back();
+    return result;
+}
+
+void Save::undo(const std::string& reason) {
+    try {
+        transaction_.undo();
+    } catch (const std::system_error& error) {
+        fail(reason + "; and it could not be made what it was: " + error.what(), SaveError::Reason::NotUndone);
+    }
+}
+
+/// Names the movie where the platform does not.
+template <class Work>
+auto save(const FileLocation& movie, const SafeMovieSave::Progress& progress, Work work) {
+    try {
+        return Save(movie, progress).orUndo(work);
+    } catch (const std::system_error& error) {
+        throw SaveError(utf8Path(movie), error.what());
+    }
+}
+
+} // namespace
+
+SafeMovieSave::SafeMovieSave(FileLocation movie, Progress progress)
+    : movie_(std::move(movie)), progress_(std::move(progress)) {}
+
+RepairPlan SafeMovieSave::plan() const {
+    std::ifstream movie = openMovie(movie_);
+    return planRepair(movie);
+}
+
+RepairPlan SafeMovieSave::repair() const {
+    return save(movie_, progress_, [](Save& work) { return work.repair(); });
+}
+
+AttachResult SafeMovieSave::attach(const std::vector<StreamSource>& streams, Existing existing) const {
+    if (streams.empty())
+        throw SaveError(utf8Path(movie_), "there are no streams to attach");
+    std::vector<Candidate> candidates = examine(streams);
+    return save(movie_, progress_, [&](Save& work) { return work.attach(candidates, existing); });
+}
+
+StampResult SafeMovieSave::stamp(const std::string& creatorName, const std::string& creatorVersion) const {
+    return save(movie_, progress_,
+                [info = recordingInfo(creatorName, creatorVersion)](Save& work) { return work.stamp(info); });
+}
+
+} // namespace ZULMetaData

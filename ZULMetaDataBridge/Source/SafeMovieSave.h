@@ -1,0 +1,103 @@
+#pragma once
+
+// Puts streams and recording info into a movie so that they are found again, or leaves it as it was.
+//
+//     const AttachResult saved = SafeMovieSave("Recording.mp4").attach({StreamSource::file("cursorLocation.dat")});
+//     for (const AttachedStream& stream : saved.streams)
+//         std::cout << stream.name << ": " << stream.entries << " entries, " << stream.bytesCut << " bytes cut off\n";
+
+#include "Platform/FileLocation.h"
+#include "SharedDependencies/ZCAPHeader.h"
+#include "ZULMetaData/RepairPlan.h"
+#include "ZULMetaData/StreamExtent.h"
+#include "ZULMetaDataBridge/Source/StreamSource.h"
+
+#include <cstdint>
+#include <functional>
+#include <stdexcept>
+#include <string>
+#include <vector>
+
+namespace ZULMetaData {
+
+/// Why a movie was not changed as it should: one sentence about one file.
+class SaveError : public std::runtime_error {
+public:
+    enum class Reason {
+        Failed,     ///< the movie is what it was
+        KindExists, ///< so it is, and has a stream of that kind already
+        NotUndone,  ///< the operation failed, and the movie could not be made what it was
+    };
+
+    SaveError(const std::string& file, const std::string& sentence, Reason reason = Reason::Failed)
+        : std::runtime_error(file + ": " + sentence), file_(file), sentence_(sentence), reason_(reason) {}
+
+    /// The movie's path, or the name of a stream's source.
+    const std::string& file() const { return file_; }
+    const std::string& sentence() const { return sentence_; }
+    Reason reason() const { return reason_; }
+
+private:
+    std::string file_;
+    std::string sentence_;
+    Reason reason_;
+};
+
+struct AttachedStream {
+    std::string name; ///< of its source
+    uuid type{};
+    std::uint64_t offset = 0; ///< of its header in the movie
+    std::uint64_t bytes = 0;  ///< header and whole entries
+    std::uint64_t entries = 0;
+    std::uint64_t bytesCut = 0; ///< left out, from `bytes` on in the source
+    StreamExtent::End cutBecause = StreamExtent::AtEntry;
+};
+
+struct AttachResult {
+    RepairPlan repair; ///< what was done before
+    std::vector<AttachedStream> streams;
+};
+
+struct StampResult {
+    RepairPlan repair; ///< what was done before
+    ZCAPHeader info;   ///< as it can be read back
+};
+
+/// Every operation first repairs the movie as `planRepair` says, and throws `SaveError` where that cannot be done.
+/// What it appends reaches the disk before its size does, and is read back. Where anything fails, the repair included,
+/// the movie becomes byte for byte what it was, and `SaveError` is thrown. Only where even that fails is it not; the
+/// error then says so.
+///
+/// A program that ends in the middle of it leaves an append that was interrupted, which the next operation repairs.
+/// The movie is locked against other programs that use this class. Needs about a megabyte, whatever the streams hold.
+class SafeMovieSave {
+public:
+    /// What to do about streams of kinds that the movie has already. Readers take the last one: the others would stay
+    /// in the file, unread.
+    enum class Existing { Refuse, Supersede };
+
+    /// Called now and then with the bytes that were written or read back. What it throws ends and undoes the
+    /// operation.
+    using Progress = std::function<void(std::uint64_t done, std::uint64_t total)>;
+
+    explicit SafeMovieSave(FileLocation movie, Progress progress = {});
+
+    /// What `repair` would do. Changes nothing, and needs no right to.
+    RepairPlan plan() const;
+
+    /// Gives what was done.
+    RepairPlan repair() const;
+
+    /// Appends the streams as one atom, in this order. What stands behind a stream's last whole entry is left out.
+    /// Throws for a stream without a header, for two of one kind, for none at all, and see `Existing`.
+    AttachResult attach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse) const;
+
+    /// Appends what `ZULRAtomWriter::writeZULRtoFile` does. It never ends the process.
+    StampResult stamp(const std::string& creatorName, const std::string& creatorVersion) const;
+
+private:
+    FileLocation movie_;
+    Progress progress_;
+};
+
+} // namespace ZULMetaData

@@ -1,0 +1,64 @@
+#pragma once
+
+// Copies a stream without what nobody else should see.
+//
+//     Redaction redaction;
+//     redaction.clearsKeys = true;
+//     std::ofstream copy("keyboardAction.dat", std::ios::binary);
+//     redactStream(StreamSource::file("private/keyboardAction.dat").open(), redaction, copy);
+
+#include "ZULMetaData/ZULMMetaDataUUIDs.h"
+#include "ZULMetaDataBridge/Source/StreamSource.h"
+
+#include <cstdint>
+#include <functional>
+#include <optional>
+#include <ostream>
+#include <set>
+#include <string>
+
+namespace ZULMetaData {
+
+/// What takes the place of a hidden text: an ellipsis, whatever its length was.
+inline constexpr const char* s_hiddenText = "\xe2\x80\xa6";
+
+struct TimeRange {
+    double from = 0; ///< seconds; both ends belong to it
+    double to = 0;
+};
+
+struct Redaction {
+    std::set<uuid> removedKinds;
+
+    /// Every keystroke becomes character code 0 without modifier flags, which tell something of the text, too. Their
+    /// times stay.
+    bool clearsKeys = false;
+
+    /// Whether a title, text, comment or name becomes `s_hiddenText`. Gets the stored bytes.
+    std::function<bool(const std::string&)> hidesText;
+
+    /// Entries with a time in it are removed, and those whose time is not a number.
+    std::optional<TimeRange> removedTimes;
+};
+
+struct RedactedStream {
+    /// Why it is not in the copy.
+    enum Removal : std::int32_t {
+        None,
+        Asked,
+        Undecodable, ///< of a kind or version that cannot be looked into, though something in it might have to go
+        Headless,    ///< too short for a stream's header
+    };
+
+    MetaDataHeader header;
+    Removal removal = None;
+    std::uint64_t entries = 0; ///< in the copy
+    std::uint64_t entriesRemoved = 0;
+    std::uint64_t entriesChanged = 0;
+    std::uint64_t bytesLeftOut = 0; ///< behind the last entry that could be read, which nobody could check
+};
+
+/// Appends the copy to `out`, or nothing where the stream is removed. Failures of `out` show in its state alone.
+RedactedStream redactStream(const StreamSource::Bytes& stream, const Redaction& redaction, std::ostream& out);
+
+} // namespace ZULMetaData

@@ -1,0 +1,315 @@
+#include "ZULMetaDataBridge/Source/StreamSalvage.h"
+
+#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/ZULMMetaDataWriter.h"
+#include "ZULMetaDataBridge/Source/KindEntries.h"
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <cstring>
+#include <iterator>
+#include <string>
+#include <string_view>
+#include <tuple>
+#include <utility>
+
+namespace ZULMetaData {
+
+namespace {
+
+constexpr std::size_t s_blockSize = 4 << 20;
+
+/// What all registered identifiers end with.
+constexpr std::size_t s_groupSize = 4;
+constexpr std::size_t s_tailSize = sizeof(uuid) - s_groupSize;
+
+/// Bytes in front of an identifier's tail that tell what is around the stream, and from the tail to the header's end.
+constexpr std::size_t s_before = detail::s_extendedAtomHeaderSize + s_groupSize;
+constexpr std::size_t s_behind = s_metaDataHeaderSize - s_groupSize;
+
+std::string_view tailOfIdentifiers() {
+    return {reinterpret_cast<const char*>(s_metaDataKinds.front().type.data) + s_groupSize, s_tailSize};
+}
+
+/// No recording began a day before its time line or lasts ten years.
+bool canBeTime(double seconds) {
+    constexpr double day = 86400;
+    return std::isfinite(seconds) && seconds >= -day && seconds < 3652 * day;
+}
+
+template <class Value>
+std::optional<double> timeOf(std::string_view bytes) {
+    const auto decoded = decodeEntry<Value>(bytes, 1);
+    return decoded ? std::optional<double>(decoded->time) : std::nullopt;
+}
+
+/// Of a kind that is registered, but whose values nobody here reads: they are one of those that there are.
+template <class... Values>
+bool isEntryOfAny(const MetaDataHeader& header, std::string_view bytes) {
+    const auto isOne = [&]<class Value>() {
+        const std::optional<double> time = timeOf<Value>(bytes);
+        return metaDataFixedEntrySize<Value>() == header.fixedEntrySize && time && canBeTime(*time);
+    };
+    return (isOne.template operator()<Values>() || ...);
+}
+
+bool canBeEntry(const MetaDataHeader& header, std::string_view bytes) {
+    if (!isDecodable(header))
+        return isEntryOfAny<int, double, Rect, std::string, std::list<std::string>>(header, bytes);
+    const std::optional<double> time = timeOfEntry(header, bytes);
+    return time && canBeTime(*time);
+}
+
+bool canBeHeader(const MetaDataHeader& header) {
+    const MetaDataKind* kind = findMetaDataKind(header.uuid);
+    if (!kind || header.version < 1 || header.version > kind->currentVersion)
+        return false;
+    if (isDecodable(header))
+        return header.fixedEntrySize == entrySizeOf(header);
+    constexpr std::array sizes{0U, unsigned{sizeof(double) + sizeof(int)}, unsigned{sizeof(double) + sizeof(Point)},
+                               unsigned{sizeof(double) + sizeof(Rect)}};
+    return std::ranges::find(sizes, header.fixedEntrySize) != sizes.end();
+}
+
+template <class Number>
+Number numberAt(std::string_view bytes, std::size_t offset) {
+    Number number{};
+    std::memcpy(&number, bytes.data() + offset, sizeof number);
+    return number;
+}
+
+/// The header of a DATA atom or chunk, in front of a stream.
+struct DataHeader {
+    std::uint64_t size = 0; ///< its own
+    std::uint64_t payload = 0;
+};
+
+/// What `before` ends with, in one of its three forms.
+std::optional<DataHeader> dataHeaderAtEndOf(std::string_view before) {
+    using namespace detail;
+    constexpr std::uint32_t type = swapInt(s_streamAtom); // as it is stored
+    const std::size_t end = before.size();
+    const std::size_t chunk = end - s_chunkHeaderSize;
+    if (end < s_chunkHeaderSize)
+        return std::nullopt;
+    const std::size_t extended = end - s_extendedAtomHeaderSize;
+    if (end >= s_extendedAtomHeaderSize && numberAt<std::uint32_t>(before, extended + 4) == type &&
+        swapInt(numberAt<std::uint32_t>(before, extended)) == s_extendedSizeMarker)
+        return DataHeader{s_extendedAtomHeaderSize,
+                          swapInt(numberAt<std::uint64_t>(before, chunk)) - s_extendedAtomHeaderSize};
+    if (numberAt<std::uint32_t>(before, chunk + 4) == type)
+        return DataHeader{s_atomHeaderSize, swapInt(numberAt<std::uint32_t>(before, chunk)) - s_atomHeaderSize};
+    if (numberAt<std::uint32_t>(before, chunk) == type)
+        return DataHeader{s_chunkHeaderSize, numberAt<std::uint32_t>(before, chunk + 4)};
+    return std::nullopt;
+}
+
+/// Marker and type of an atom as the library writes it. No other bytes of a stream are likely to look like this.
+std::string itemMark(std::uint32_t type) {
+    const auto header = detail::extendedAtomHeader(type, 0);
+    return {header.data(), detail::s_atomHeaderSize};
+}
+
+ReadBytes readingBehind(ReadBytes read, std::uint64_t offset) {
+    return [read = std::move(read), offset](std::uint64_t position, std::span<char> bytes) {
+        return read(offset + position, bytes);
+    };
+}
+
+} // namespace
+
+StreamSalvage::StreamSalvage(std::istream& file, MetaDataParser::StreamType type, Progress progress)
+    : read_(readingFrom(file)), file_(file), type_(type), progress_(std::move(progress)) {
+    file_.clear();
+    total_ = static_cast<std::uint64_t>(std::max<std::int64_t>(ParserUtil::calcFileSize(file_), 0));
+}
+
+SalvageReport StreamSalvage::run() {
+    candidates_.clear();
+    reachable_.clear();
+    hasMore_ = false;
+    findReachable();
+    search();
+    measureAll();
+    return report();
+}
+
+void StreamSalvage::findReachable() {
+    const auto add = [this](std::uint64_t begin, std::uint64_t offset, std::uint64_t declared) {
+        Candidate found{{}, begin};
+        MetaDataHeader& header = found.stream.header;
+        if (declared < sizeof header || reachable_.size() == SalvageReport::s_maximumStreams ||
+            read_(offset, {reinterpret_cast<char*>(&header), sizeof header}) < sizeof header)
+            return;
+        found.stream.origin = SalvagedStream::Reachable;
+        found.stream.offset = offset;
+        found.stream.declaredBytes = declared;
+        reachable_.push_back(found);
+    };
+    if (type_ == MetaDataParser::RawStream)
+        return add(0, 0, total_);
+    const auto listChildren = type_ == MetaDataParser::QuickTime ? listAtoms : listChunks;
+    for (const ContainerItem& item : listTopLevel(file_, type_))
+        if (item.holdsMetaData() && item.size != 0)
+            for (const ContainerItem& child : listChildren(file_, item.payloadOffset(), item.end(), total_))
+                if (child.holdsStream())
+                    add(child.offset, child.payloadOffset(), child.payloadSize());
+}
+
+void StreamSalvage::search() {
+    std::string block(s_before + s_behind + s_blockSize, '\0');
+    std::size_t kept = 0; // of the block before, in front of what is read
+    for (std::uint64_t position = 0; position < total_;) {
+        const std::size_t size = read_(position, {block.data() + kept, s_blockSize});
+        if (size == 0)
+            return;
+        searchIn({block.data(), kept + size}, kept, position - kept);
+        position += size;
+        const std::size_t overlap = std::min(kept + size, s_before + s_behind);
+        std::memmove(block.data(), block.data() + kept + size - overlap, overlap);
+        kept = overlap;
+        if (progress_)
+            progress_(position);
+    }
+}
+
+/// `bytes` stand at `offset`; the first `kept` of them have been searched. A header that reaches beyond them is found
+/// in the next ones, which overlap with these.
+void StreamSalvage::searchIn(std::string_view bytes, std::size_t kept, std::uint64_t offset) {
+    const std::string_view tail = tailOfIdentifiers();
+    for (std::size_t at = bytes.find(tail); at != std::string_view::npos; at = bytes.find(tail, at + 1)) {
+        const bool isSeenBefore = at + s_behind <= kept;
+        if (at < s_groupSize || isSeenBefore || bytes.size() - at < s_behind)
+            continue;
+        const std::size_t start = at - s_groupSize;
+        consider(bytes.substr(start), bytes.substr(0, start), offset + start);
+    }
+}
+
+void StreamSalvage::consider(std::string_view bytes, std::string_view before, std::uint64_t offset) {
+    const auto header = numberAt<MetaDataHeader>(bytes, 0);
+    if (!canBeHeader(header))
+        return;
+    hasMore_ |= candidates_.size() == SalvageReport::s_maximumStreams;
+    if (hasMore_)
+        return;
+    Candidate found{{}, offset};
+    found.stream.header = header;
+    found.stream.offset = offset;
+    const std::optional<DataHeader> data = dataHeaderAtEndOf(before);
+    if (data && data->payload >= s_metaDataHeaderSize) {
+        found.begin -= data->size;
+        found.stream.origin = SalvagedStream::Unreachable;
+        found.stream.declaredBytes = data->payload;
+    }
+    candidates_.push_back(found);
+}
+
+void StreamSalvage::measureAll() {
+    std::erase_if(candidates_, [this](const Candidate& candidate) {
+        return std::ranges::any_of(
+            reachable_, [&](const Candidate& other) { return other.stream.offset == candidate.stream.offset; });
+    });
+    std::erase_if(candidates_, [this](Candidate& candidate) { return !beginsLikeStream(candidate.stream); });
+    std::ranges::copy(reachable_, std::back_inserter(candidates_));
+    std::ranges::sort(candidates_, {}, [](const Candidate& candidate) { return candidate.stream.offset; });
+    std::uint64_t coveredEnd = 0;
+    for (std::size_t index = 0; index < candidates_.size(); ++index) {
+        Candidate& candidate = candidates_[index];
+        const bool isInside = candidate.stream.offset < coveredEnd;
+        candidate.isStream = (!isInside || candidate.stream.origin == SalvagedStream::Reachable) && measure(index);
+        if (candidate.isStream)
+            coveredEnd = std::max(coveredEnd, candidate.stream.end());
+    }
+}
+
+bool StreamSalvage::beginsLikeStream(const SalvagedStream& stream) const {
+    if (stream.declaredBytes == s_metaDataHeaderSize)
+        return true;
+    StreamEntries entries = entriesOf(readingBehind(read_, stream.offset), declaredEndOf(stream) - stream.offset);
+    const auto first = entries.next();
+    return first && canBeEntry(stream.header, entries.bytesOf(*first));
+}
+
+/// False where there is nothing to write of it.
+bool StreamSalvage::measure(std::size_t index) {
+    Candidate& candidate = candidates_[index];
+    SalvagedStream& stream = candidate.stream;
+    const std::uint64_t declaredEnd = declaredEndOf(stream);
+    walk(stream, declaredEnd);
+    const bool isWhole = stream.declaredBytes && stream.bytes == *stream.declaredBytes;
+    if (stream.origin != SalvagedStream::Reachable || !isWhole) {
+        const std::uint64_t limit = std::min(declaredEnd, limitOf(index));
+        walk(stream, limit);
+        walk(stream, std::min(limit, nextItemIn(stream.offset + s_metaDataHeaderSize, stream.end())));
+        stream.isCutShort = stream.end() < declaredEnd && (stream.declaredBytes || stream.end() < limit);
+    }
+    stream.isCutShort |= stream.declaredBytes && stream.bytes < *stream.declaredBytes;
+    const bool isEmpty = stream.declaredBytes == s_metaDataHeaderSize;
+    const bool isKnownPlace = stream.origin == SalvagedStream::Reachable && isDecodable(stream.header);
+    return stream.entries > 0 || isEmpty || isKnownPlace;
+}
+
+std::uint64_t StreamSalvage::declaredEndOf(const SalvagedStream& stream) const {
+    const std::uint64_t present = total_ - stream.offset;
+    return stream.offset + std::min(present, stream.declaredBytes.value_or(present));
+}
+
+/// Where a stream must end because another one begins.
+std::uint64_t StreamSalvage::limitOf(std::size_t index) const {
+    const bool hasEqualEntries = candidates_[index].stream.header.fixedEntrySize != 0;
+    for (std::size_t next = index + 1; next < candidates_.size(); ++next)
+        if (hasEqualEntries || candidates_[next].stream.origin != SalvagedStream::Bare)
+            return std::max(candidates_[next].begin, candidates_[index].stream.offset + s_metaDataHeaderSize);
+    return total_;
+}
+
+void StreamSalvage::walk(SalvagedStream& stream, std::uint64_t limit) const {
+    StreamEntries entries = entriesOf(readingBehind(read_, stream.offset), limit - stream.offset);
+    stream.bytes = std::min<std::uint64_t>(s_metaDataHeaderSize, limit - stream.offset);
+    stream.entries = 0;
+    while (const auto entry = entries.next()) {
+        if (!stream.declaredBytes && !canBeEntry(stream.header, entries.bytesOf(*entry)))
+            return;
+        stream.bytes = entry->end();
+        ++stream.entries;
+    }
+}
+
+/// The first header of an atom of this library between `begin` and `end`, or `end`.
+std::uint64_t StreamSalvage::nextItemIn(std::uint64_t begin, std::uint64_t end) const {
+    const std::array marks{itemMark(detail::s_streamAtom), itemMark(detail::s_metaDataAtom),
+                           itemMark(detail::s_recordingInfoAtom)};
+    std::string block(s_blockSize, '\0');
+    for (std::uint64_t position = begin; position < end;) {
+        const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(block.size(), end - position));
+        const std::size_t size = read_(position, {block.data(), wanted});
+        const std::string_view bytes(block.data(), size);
+        std::size_t first = std::string_view::npos;
+        for (const std::string& mark : marks)
+            first = std::min(first, bytes.find(mark));
+        if (first != std::string_view::npos)
+            return position + first;
+        if (size <= detail::s_atomHeaderSize)
+            return end;
+        position += size - detail::s_atomHeaderSize + 1;
+    }
+    return end;
+}
+
+SalvageReport StreamSalvage::report() {
+    SalvageReport report;
+    report.hasMore = hasMore_;
+    for (const Candidate& candidate : candidates_)
+        if (candidate.isStream)
+            report.streams.push_back(candidate.stream);
+    std::ranges::sort(report.streams, {}, [](const SalvagedStream& stream) {
+        constexpr std::uint64_t most = ~std::uint64_t{0};
+        return std::tuple(stream.header.uuid, most - stream.entries, stream.origin, most - stream.offset);
+    });
+    return report;
+}
+
+} // namespace ZULMetaData

@@ -1,0 +1,54 @@
+#include "ZULMetaDataBridge/Source/StreamSource.h"
+
+#include "ZULMetaData/ZULMMetaDataParser.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <fstream>
+#include <limits>
+#include <memory>
+#include <system_error>
+#include <utility>
+
+namespace ZULMetaData {
+
+namespace {
+
+StreamSource::Bytes openPart(const FileLocation& location, std::uint64_t offset, std::uint64_t length) {
+    auto file = std::make_shared<std::ifstream>();
+    errno = 0;
+    fileOpen(*file, utf8Path(location).c_str(), std::ios_base::binary);
+    if (!std::filesystem::is_regular_file(location) || !file->is_open())
+        throw std::system_error(errno != 0 ? errno : EINVAL, std::generic_category(), "cannot be opened");
+    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(*file));
+    const std::uint64_t begin = std::min(offset, total);
+    return {std::min(length, total - begin), [file, begin](std::uint64_t position, std::span<char> bytes) {
+                return readingFrom(*file)(begin + position, bytes);
+            }};
+}
+
+std::size_t copyFrom(std::string_view from, std::uint64_t position, std::span<char> to) {
+    if (position >= from.size())
+        return 0;
+    return from.copy(to.data(), to.size(), static_cast<std::size_t>(position));
+}
+
+} // namespace
+
+StreamSource StreamSource::file(const FileLocation& file) {
+    return part(file, 0, std::numeric_limits<std::uint64_t>::max());
+}
+
+StreamSource StreamSource::part(const FileLocation& file, std::uint64_t offset, std::uint64_t length) {
+    return {utf8Path(file), [=] { return openPart(file, offset, length); }};
+}
+
+StreamSource StreamSource::memory(std::string_view bytes, std::string name) {
+    return {std::move(name), [bytes] {
+                return Bytes{bytes.size(), [bytes](std::uint64_t position, std::span<char> to) {
+                                 return copyFrom(bytes, position, to);
+                             }};
+            }};
+}
+
+} // namespace ZULMetaData

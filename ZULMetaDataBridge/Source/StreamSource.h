@@ -1,0 +1,44 @@
+#pragma once
+
+// One metadata stream that is to go into a movie, wherever its bytes are: in a stream file, inside another recording,
+// or in memory.
+
+#include "Platform/FileLocation.h"
+#include "ZULMetaData/StreamExtent.h"
+
+#include <cstdint>
+#include <functional>
+#include <string>
+#include <string_view>
+
+namespace ZULMetaData {
+
+/// Opens nothing before it is used. Copies are the same stream.
+class StreamSource {
+public:
+    /// A whole stream file.
+    static StreamSource file(const FileLocation& file);
+
+    /// `length` bytes of a file from `offset` on, or as many of them as it holds: what `fileDataForUUID` gives.
+    static StreamSource part(const FileLocation& file, std::uint64_t offset, std::uint64_t length);
+
+    /// Bytes of the caller, such as `loadAllData` gives, which must outlive the source. `name` is for messages.
+    static StreamSource memory(std::string_view bytes, std::string name);
+
+    const std::string& name() const { return name_; }
+
+    /// The stream's bytes, ready to be read. Throws `std::system_error` where its file cannot be opened.
+    struct Bytes {
+        std::uint64_t length = 0;
+        ReadBytes read;
+    };
+    Bytes open() const { return open_(); }
+
+private:
+    StreamSource(std::string name, std::function<Bytes()> open) : name_(std::move(name)), open_(std::move(open)) {}
+
+    std::string name_;
+    std::function<Bytes()> open_;
+};
+
+} // namespace ZULMetaData

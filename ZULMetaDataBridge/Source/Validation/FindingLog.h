@@ -1,0 +1,41 @@
+#pragma once
+
+// Findings as they are made, of which only so many are kept.
+
+#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+
+#include <cstdint>
+#include <sstream>
+#include <string>
+#include <utility>
+#include <vector>
+
+namespace ZULMetaData::detail {
+
+/// Words and numbers one after the other.
+template <class... Parts>
+std::string sentence(const Parts&... parts) {
+    std::ostringstream text;
+    text.precision(15);
+    (text << ... << parts);
+    return text.str();
+}
+
+/// Counts for the whole report; the findings go to the list of the stream or the container that they are about.
+class FindingLog {
+public:
+    explicit FindingLog(ValidationReport& report) : report_(report) {}
+
+    template <class... Parts>
+    void add(std::vector<Finding>& list, FindingCode code, const std::string& place, std::uint64_t offset,
+             const Parts&... parts) {
+        std::uint64_t& count = ruleOf(code).severity == Severity::Damage ? report_.damageCount : report_.noticeCount;
+        if (count++ < ValidationReport::s_maximumFindings)
+            list.push_back({code, place, offset, sentence(parts...)});
+    }
+
+private:
+    ValidationReport& report_;
+};
+
+} // namespace ZULMetaData::detail
