@@ -1,7 +1,8 @@
 # What the tests of the tool share: running it, and a recording to run it on.
-add_library(ZULMetaDataToolTestSupport Tools/RecordedSession.cpp Tools/ToolRun.cpp)
+add_library(ZULMetaDataToolTestSupport Tools/Golden.cpp Tools/RecordedSession.cpp Tools/ToolRun.cpp)
 target_link_libraries(ZULMetaDataToolTestSupport PUBLIC ZULMetaDataTestSupport zulm_demo)
-target_compile_definitions(ZULMetaDataToolTestSupport PRIVATE ZULM_PATH="$<TARGET_FILE:zulm>")
+target_compile_definitions(ZULMetaDataToolTestSupport PRIVATE
+  ZULM_PATH="$<TARGET_FILE:zulm>" ZULM_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/Data")
 zulm_project_options(ZULMetaDataToolTestSupport)
 
 # zulm_add_tool_test(PATH): as zulm_add_test, for a test that runs the tool. ZULM_PATH is the built tool.
@@ -13,5 +14,12 @@ function(zulm_add_tool_test path)
   add_dependencies(${name} zulm)
 endfunction()
 
+zulm_add_tool_test(Tools/AtomsCommandTest)
+zulm_add_tool_test(Tools/CommandLineTest)
+zulm_add_tool_test(Tools/DemoCommandTest)
+zulm_add_tool_test(Tools/DumpCommandTest)
+zulm_add_tool_test(Tools/InfoCommandTest)
+zulm_add_tool_test(Tools/ManualTest)
+target_compile_definitions(Tools.ManualTest PRIVATE ZULM_DOCS="${PROJECT_SOURCE_DIR}/Docs")
 zulm_add_tool_test(Tools/ToolRunTest)
 include(Tools/VerifyTests.cmake)

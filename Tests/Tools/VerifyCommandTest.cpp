@@ -8,6 +8,7 @@
 
 #include <nlohmann/json.hpp>
 
+#include <algorithm>
 #include <limits>
 
 namespace ZULMetaData::Test {
@@ -30,6 +31,11 @@ struct VerifyCommand : RecordedSession {
         return folder / name;
     }
 };
+
+std::string invalidRecording(const std::string& name) {
+    const auto files = invalidCorpus();
+    return std::ranges::find(files, name, &InvalidFile::name)->path;
+}
 
 std::string locations(const std::vector<double>& times) {
     std::string stream = streamHeader("2b7b6af2", 1, 16);
@@ -182,6 +188,13 @@ TEST_F(VerifyCommand, SaysWhatToRunForAnInterruptedAppend) {
     const ToolResult result = runTool({"verify", file});
     EXPECT_EQ(result.exitCode, 3);
     EXPECT_NE(result.errors.find("'zulm repair --dry-run " + file + "'"), std::string::npos) << result.errors;
+}
+
+TEST_F(VerifyCommand, SaysWhatToRunForStreamsThatNoReaderFinds) {
+    const std::string movie = invalidRecording("movie-dropped-tail.mp4");
+    const ToolResult result = runTool({"verify", movie});
+    EXPECT_NE(result.errors.find("'zulm salvage " + movie + " -o DIR'"), std::string::npos) << result.errors;
+    EXPECT_EQ(runTool({"verify", "--quiet", movie}).errors, "");
 }
 
 } // namespace

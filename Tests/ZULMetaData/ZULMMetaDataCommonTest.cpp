@@ -1,25 +1,403 @@
+// The values that streams carry, and the identifiers of their kinds.
+
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 
 #include "Tests/Support/Bytes.h"
+#include "Tests/ZULMetaData/MemoryWatch.h"
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <cstddef>
+#include <cstdint>
 #include <cstdlib>
+#include <cstring>
 #include <iomanip>
+#include <limits>
 #include <sstream>
+#include <string>
+#include <type_traits>
 #include <utility>
+#include <vector>
 
-namespace ZULMetaData {
+namespace ZULMetaData::Test {
 
 namespace {
 
-using namespace Test;
-
 template <class T>
-std::string textOf(const T& value) {
-    std::ostringstream stream;
-    stream << value;
-    return stream.str();
+std::string printed(const T& value) {
+    std::ostringstream out;
+    out << value;
+    return out.str();
+}
+
+constexpr std::int32_t s_lowest = std::numeric_limits<std::int32_t>::min();
+constexpr std::int32_t s_highest = std::numeric_limits<std::int32_t>::max();
+
+// ---- Points, rectangles, keys ---------------------------------------------------------------------------------
+
+TEST(Point, BeginsAtTheOrigin) {
+    EXPECT_EQ(Point().x, 0);
+    EXPECT_EQ(Point().y, 0);
+}
+
+TEST(Point, LiesInMemoryAsXAndY) {
+    EXPECT_EQ(raw(Point(10, -4)), hex("0a000000 fcffffff"));
+}
+
+TEST(Point, EqualsAPointWithTheSameFields) {
+    const Point point(10, -4);
+    EXPECT_TRUE(point == Point(10, -4));
+    EXPECT_FALSE(point != Point(10, -4));
+    EXPECT_TRUE(point != Point(11, -4));
+    EXPECT_TRUE(point != Point(10, 4));
+    EXPECT_FALSE(point == Point(-4, 10));
+}
+
+TEST(Point, PrintsItsFields) {
+    EXPECT_EQ(printed(Point(10, -4)), "(10,-4)");
+    EXPECT_EQ(printed(Point(s_lowest, s_highest)), "(-2147483648,2147483647)");
+}
+
+TEST(Rect, BeginsEmptyAtTheOrigin) {
+    EXPECT_EQ(raw(Rect()), std::string(16, '\0'));
+}
+
+TEST(Rect, LiesInMemoryAsOriginAndSize) {
+    EXPECT_EQ(raw(Rect(1, -2, 300, 70000)), hex("01000000 feffffff 2c010000 70110100"));
+}
+
+TEST(Rect, EqualsARectWithTheSameFields) {
+    const Rect rect(1, 2, 3, 4);
+    EXPECT_TRUE(rect == Rect(1, 2, 3, 4));
+    EXPECT_FALSE(rect != Rect(1, 2, 3, 4));
+    for (const Rect& other : {Rect(9, 2, 3, 4), Rect(1, 9, 3, 4), Rect(1, 2, 9, 4), Rect(1, 2, 3, 9)}) {
+        EXPECT_TRUE(rect != other) << other;
+        EXPECT_FALSE(rect == other) << other;
+    }
+}
+
+TEST(Rect, PrintsItsFields) {
+    EXPECT_EQ(printed(Rect(1, -2, 300, 70000)), "(1,-2,300,70000)");
+}
+
+TEST(KeyStroke, BeginsAsZeros) {
+    EXPECT_EQ(raw(KeyStroke()), std::string(8, '\0'));
+}
+
+TEST(KeyStroke, LiesInMemoryAsCharacterAndFlags) {
+    EXPECT_EQ(raw(KeyStroke(0x61, 0x00100108)), hex("61000000 08011000"));
+}
+
+TEST(KeyStroke, EqualsAKeyStrokeWithTheSameFields) {
+    const KeyStroke key(1, 2);
+    EXPECT_TRUE(key == KeyStroke(1, 2));
+    EXPECT_FALSE(key != KeyStroke(1, 2));
+    EXPECT_TRUE(key != KeyStroke(9, 2));
+    EXPECT_TRUE(key != KeyStroke(1, 9));
+}
+
+TEST(KeyStroke, PrintsItsFieldsUnsigned) {
+    EXPECT_EQ(printed(KeyStroke(0x61, 0xffffffff)), "(97,4294967295)");
+}
+
+// ---- Cursor images --------------------------------------------------------------------------------------------
+
+constexpr CursorTypeID s_arrow{5};
+constexpr CursorImage::CursorImageFlags s_flags{1};
+
+unsigned char* newBytes(const std::string& bytes) {
+    auto* const block = static_cast<unsigned char*>(std::malloc(bytes.size()));
+    std::memcpy(block, bytes.data(), bytes.size());
+    return block;
+}
+
+CursorImage arrowWith(const std::string& bytes) {
+    return {7, 3, -2, newBytes(bytes), static_cast<std::uint32_t>(bytes.size()), s_arrow, s_flags};
+}
+
+/// A size that no bytes stand behind.
+CursorImage arrowWithoutItsBytes(std::uint32_t size) {
+    return {7, 3, -2, nullptr, size, s_arrow, s_flags};
+}
+
+std::string imageBytes(const CursorImage& image) {
+    return image.imageData ? std::string(image.imageData, image.imageData + image.imageDataSize) : "no buffer";
+}
+
+void expectNoImage(const CursorImage& image) {
+    EXPECT_EQ(image.imageData, nullptr);
+    EXPECT_EQ(image.imageDataSize, 0U);
+}
+
+void expectArrow(const CursorImage& image) {
+    EXPECT_EQ(image.uniqueId, 7U);
+    EXPECT_EQ(image.hotspotOffsetX, 3);
+    EXPECT_EQ(image.hotspotOffsetY, -2);
+    EXPECT_EQ(image.cursorTypeId, s_arrow);
+    EXPECT_EQ(image.flags, s_flags);
+}
+
+TEST(CursorImage, BeginsUnknownWithoutAnImage) {
+    const CursorImage image;
+    EXPECT_EQ(image.uniqueId, 0U);
+    EXPECT_EQ(image.hotspotOffsetX, 0);
+    EXPECT_EQ(image.hotspotOffsetY, 0);
+    expectNoImage(image);
+    EXPECT_EQ(image.cursorTypeId, -1);
+    EXPECT_EQ(image.flags, 3U);
+}
+
+TEST(CursorImage, AdoptsTheBytesItIsGivenAndFreesThem) {
+    MemoryWatch memory;
+    unsigned char* const bytes = newBytes("PNG");
+    {
+        const CursorImage image(7, 3, -2, bytes, 3, s_arrow, s_flags);
+        expectArrow(image);
+        EXPECT_EQ(image.imageData, bytes);
+        EXPECT_EQ(image.imageDataSize, 3U);
+        EXPECT_EQ(memory.blocks(), 1);
+    }
+    EXPECT_EQ(memory.blocks(), 0);
+}
+
+TEST(CursorImage, IsFreedThroughItsVirtualDestructor) {
+    EXPECT_TRUE(std::has_virtual_destructor_v<CursorImage>);
+}
+
+TEST(CursorImageCopy, HasBytesOfItsOwn) {
+    const CursorImage original = arrowWith("PNG");
+    const CursorImage copy(original);
+    expectArrow(copy);
+    EXPECT_EQ(imageBytes(copy), "PNG");
+    EXPECT_NE(copy.imageData, original.imageData);
+    EXPECT_EQ(imageBytes(original), "PNG");
+}
+
+TEST(CursorImageCopy, OutlivesItsOriginal) {
+    CursorImage copy;
+    {
+        const CursorImage original = arrowWith("PNG");
+        copy = original;
+    }
+    expectArrow(copy);
+    EXPECT_EQ(imageBytes(copy), "PNG");
+}
+
+TEST(CursorImageCopy, LosesTheSizeThatNoBytesStandBehind) {
+    const CursorImage original = arrowWithoutItsBytes(8);
+    const CursorImage copy(original);
+    expectArrow(copy);
+    expectNoImage(copy);
+    EXPECT_EQ(original.imageDataSize, 8U);
+}
+
+TEST(CursorImageCopy, LosesBytesWithoutASize) {
+    CursorImage original = arrowWith("PNG");
+    original.imageDataSize = 0;
+    const CursorImage copy(original);
+    expectNoImage(copy);
+}
+
+TEST(CursorImageCopy, HasASizeButNoBytesWhereMemoryRanOut) {
+    const CursorImage original = arrowWith("PNG");
+    MemoryWatch memory;
+    memory.refuseAbove(2);
+    const CursorImage copy(original);
+    expectArrow(copy);
+    EXPECT_EQ(copy.imageData, nullptr);
+    EXPECT_EQ(copy.imageDataSize, 3U);
+}
+
+TEST(CursorImageAssignment, FreesTheImageItReplaces) {
+    MemoryWatch memory;
+    {
+        CursorImage image = arrowWith("old image");
+        image = arrowWith("PNG");
+        const CursorImage original = arrowWith("PNG2");
+        image = original;
+        EXPECT_EQ(imageBytes(image), "PNG2");
+        EXPECT_EQ(memory.blocks(), 2);
+    }
+    EXPECT_EQ(memory.blocks(), 0);
+}
+
+TEST(CursorImageAssignment, FreesTheImageEvenWhereItBringsNone) {
+    MemoryWatch memory;
+    CursorImage image = arrowWith("old image");
+    const CursorImage original = arrowWithoutItsBytes(8);
+    image = original;
+    expectNoImage(image);
+    EXPECT_EQ(memory.blocks(), 0);
+}
+
+TEST(CursorImageAssignment, ReplacesEveryField) {
+    const CursorImage original = arrowWith("PNG");
+    CursorImage image(1, 1, 1, nullptr, 0, CursorTypeID{1}, CursorImage::CursorImageFlags{9});
+    image = original;
+    expectArrow(image);
+    image = CursorImage();
+    EXPECT_EQ(printed(image), "(0,0,0,0,0,-1,3)");
+}
+
+TEST(CursorImageAssignment, ToItselfDoesNothing) {
+    CursorImage image = arrowWith("PNG");
+    const unsigned char* const bytes = image.imageData;
+    const CursorImage& same = image;
+    image = same;
+    expectArrow(image);
+    EXPECT_EQ(image.imageData, bytes);
+    EXPECT_EQ(imageBytes(image), "PNG");
+}
+
+TEST(CursorImageMove, TakesTheBytesAlong) {
+    CursorImage original = arrowWith("PNG");
+    const unsigned char* const bytes = original.imageData;
+    const CursorImage moved(std::move(original));
+    expectArrow(moved);
+    EXPECT_EQ(moved.imageData, bytes);
+    EXPECT_EQ(moved.imageDataSize, 3U);
+    expectNoImage(original);
+}
+
+TEST(CursorImageMove, FreesTheImageItReplaces) {
+    MemoryWatch memory;
+    {
+        CursorImage image = arrowWith("old image");
+        CursorImage original = arrowWith("PNG");
+        image = std::move(original);
+        expectArrow(image);
+        EXPECT_EQ(imageBytes(image), "PNG");
+        expectNoImage(original);
+        EXPECT_EQ(memory.blocks(), 1);
+    }
+    EXPECT_EQ(memory.blocks(), 0);
+}
+
+TEST(CursorImageMove, ToItselfDoesNothing) {
+    CursorImage image = arrowWith("PNG");
+    CursorImage& same = image;
+    image = std::move(same);
+    expectArrow(image);
+    EXPECT_EQ(imageBytes(image), "PNG");
+}
+
+TEST(FreeImageData, FreesTheBytesOnRequest) {
+    MemoryWatch memory;
+    CursorImage image = arrowWith("PNG");
+    image.freeImageData(true);
+    expectNoImage(image);
+    expectArrow(image);
+    EXPECT_EQ(memory.blocks(), 0);
+}
+
+TEST(FreeImageData, LeavesTheBytesToTheCallerOtherwise) {
+    MemoryWatch memory;
+    CursorImage image = arrowWith("PNG");
+    unsigned char* const bytes = image.imageData;
+    image.freeImageData(false);
+    expectNoImage(image);
+    EXPECT_EQ(memory.blocks(), 1);
+    EXPECT_EQ(std::memcmp(bytes, "PNG", 3), 0);
+    std::free(bytes);
+}
+
+TEST(FreeImageData, DropsASizeThatNoBytesStandBehind) {
+    for (const bool freeBytes : {true, false}) {
+        CursorImage image = arrowWithoutItsBytes(8);
+        image.freeImageData(freeBytes);
+        expectNoImage(image);
+    }
+}
+
+TEST(FreeImageData, MayBeCalledAgain) {
+    MemoryWatch memory;
+    CursorImage image = arrowWith("PNG");
+    image.freeImageData(true);
+    image.freeImageData(true);
+    image.freeImageData(false);
+    expectNoImage(image);
+    EXPECT_EQ(memory.blocks(), 0);
+}
+
+TEST(CursorImageEquality, ComparesTheBytes) {
+    const CursorImage image = arrowWith("PNG");
+    EXPECT_TRUE(image == arrowWith("PNG"));
+    EXPECT_FALSE(image != arrowWith("PNG"));
+    EXPECT_FALSE(image == arrowWith("PNK"));
+    EXPECT_TRUE(image != arrowWith("PNK"));
+    EXPECT_FALSE(image == arrowWith("PNG2"));
+}
+
+TEST(CursorImageEquality, ComparesEveryField) {
+    const CursorImage image = arrowWithoutItsBytes(0);
+    EXPECT_TRUE(image == arrowWithoutItsBytes(0));
+    const CursorImage others[] = {
+        {8, 3, -2, nullptr, 0, s_arrow, s_flags},
+        {7, 4, -2, nullptr, 0, s_arrow, s_flags},
+        {7, 3, 2, nullptr, 0, s_arrow, s_flags},
+        {7, 3, -2, nullptr, 1, s_arrow, s_flags},
+        {7, 3, -2, nullptr, 0, CursorTypeUnknown, s_flags},
+        {7, 3, -2, nullptr, 0, s_arrow, CursorImage::DefaultFlags},
+    };
+    for (const CursorImage& other : others) {
+        EXPECT_FALSE(image == other) << other;
+        EXPECT_TRUE(image != other) << other;
+    }
+}
+
+TEST(CursorImageEquality, TellsIdentifiersApartInTheirUpperHalf) {
+    CursorImage image;
+    image.uniqueId = 0x100000000;
+    EXPECT_FALSE(image == CursorImage());
+}
+
+TEST(CursorImageEquality, LeavesBytesOutThatOneOfTheImagesLacks) {
+    const CursorImage image = arrowWith("PNG");
+    EXPECT_TRUE(image == arrowWithoutItsBytes(3));
+    EXPECT_TRUE(arrowWithoutItsBytes(3) == image);
+    EXPECT_TRUE(arrowWithoutItsBytes(3) == arrowWithoutItsBytes(3));
+    EXPECT_FALSE(arrowWithoutItsBytes(4) == image);
+}
+
+TEST(CursorImageEquality, LeavesTheBytesOfASizeOfZeroOut) {
+    CursorImage image = arrowWith("PNG");
+    CursorImage other = arrowWith("ICO");
+    image.imageDataSize = other.imageDataSize = 0;
+    EXPECT_TRUE(image == other);
+}
+
+TEST(CursorImageEquality, HoldsForTheObjectItself) {
+    const CursorImage image = arrowWith("PNG");
+    const CursorImage& same = image;
+    EXPECT_TRUE(image == same);
+    EXPECT_FALSE(image != same);
+}
+
+TEST(CursorImage, PrintsItsFields) {
+    EXPECT_EQ(printed(CursorImage()), "(0,0,0,0,0,-1,3)");
+    EXPECT_EQ(printed(CursorImage(0xffffffffffffffff, s_lowest, s_highest, nullptr, 0xffffffff, s_arrow,
+                                  CursorImage::CursorImageFlags{0xfffffffe})),
+              "(18446744073709551615,-2147483648,2147483647,4294967295,0,5,4294967294)");
+}
+
+TEST(CursorImage, PrintsTheAddressOfItsBytesAsANumber) {
+    const CursorImage image = arrowWith("PNG");
+    const auto address = reinterpret_cast<std::int64_t>(image.imageData);
+    EXPECT_EQ(printed(image), "(7,3,-2,3," + std::to_string(address) + ",5,1)");
+}
+
+// ---- Identifiers ----------------------------------------------------------------------------------------------
+
+constexpr uuid s_id = {
+    {0x2b, 0x7b, 0x6a, 0xf1, 0x7a, 0x1f, 0x11, 0xe2, 0x83, 0xd0, 0x00, 0x17, 0xf2, 0x00, 0xbe, 0x7f}};
+constexpr const char* s_idText = "2b7b6af1-7a1f-11e2-83d0-0017f200be7f";
+
+/// All zero but for one byte.
+constexpr uuid withByte(std::size_t index, std::uint8_t value) {
+    uuid id{};
+    id.data[index] = value;
+    return id;
 }
 
 uuid parsed(const std::string& text) {
@@ -29,234 +407,204 @@ uuid parsed(const std::string& text) {
     return id;
 }
 
-unsigned char* newBytes(const std::string& bytes) {
-    auto* copy = static_cast<unsigned char*>(std::malloc(bytes.size()));
-    std::memcpy(copy, bytes.data(), bytes.size());
-    return copy;
+/// The identifier's text with this pair of digits in front.
+std::uint8_t firstByteOf(const std::string& pair) {
+    return parsed(pair + "7b6af1-7a1f-11e2-83d0-0017f200be7f").data[0];
 }
 
-CursorImage imageOf(const std::string& bytes) {
-    return CursorImage(7, -3, 4, newBytes(bytes), static_cast<std::uint32_t>(bytes.size()),
-                       static_cast<CursorTypeID>(5), static_cast<CursorImage::CursorImageFlags>(9));
+TEST(UUID, IsSixteenBytesInTheOrderOfItsText) {
+    EXPECT_EQ(raw(s_id), hex("2b7b6af1 7a1f 11e2 83d0 0017f200be7f"));
+    EXPECT_EQ(raw(uuid{}), std::string(16, '\0'));
 }
 
-std::string bytesOf(const CursorImage& image) {
-    return {reinterpret_cast<const char*>(image.imageData), image.imageDataSize};
+TEST(UUID, EqualsWhereAllBytesDo) {
+    EXPECT_TRUE(s_id == parsed(s_idText));
+    EXPECT_FALSE(s_id != parsed(s_idText));
+    for (std::size_t index = 0; index < 16; ++index) {
+        uuid other = s_id;
+        other.data[index] ^= 0x80;
+        EXPECT_FALSE(s_id == other) << index;
+        EXPECT_TRUE(s_id != other) << index;
+    }
 }
 
-const std::string s_text = "2b7b6af1-7a1f-11e2-83d0-0017f200be7f";
-const std::string s_bytes = hex("2b7b6af1 7a1f 11e2 83d0 0017f200be7f");
-
-TEST(ValueTypes, AreZeroByDefault) {
-    EXPECT_EQ(Point(), Point(0, 0));
-    EXPECT_EQ(Rect(), Rect(0, 0, 0, 0));
-    EXPECT_EQ(KeyStroke(), KeyStroke(0, 0));
+TEST(UUID, IsOrderedByItsBytesFromTheFirstOn) {
+    const uuid zero{};
+    EXPECT_TRUE(zero < withByte(15, 1));
+    EXPECT_TRUE(withByte(15, 1) < withByte(3, 1));
+    EXPECT_FALSE(withByte(3, 1) < withByte(15, 1));
+    EXPECT_TRUE(withByte(15, 0xff) < withByte(14, 1));
+    EXPECT_TRUE(withByte(1, 0xff) < withByte(0, 1));
+    EXPECT_FALSE(s_id < s_id);
 }
 
-TEST(ValueTypes, AreEqualWhenEveryFieldIs) {
-    EXPECT_EQ(Rect(1, 2, 3, 4), Rect(1, 2, 3, 4));
-    for (const Rect& other : {Rect(9, 2, 3, 4), Rect(1, 9, 3, 4), Rect(1, 2, 9, 4), Rect(1, 2, 3, 9)})
-        EXPECT_NE(Rect(1, 2, 3, 4), other);
-    EXPECT_NE(Point(1, 2), Point(1, 3));
-    EXPECT_NE(Point(1, 2), Point(3, 2));
-    EXPECT_NE(KeyStroke(1, 2), KeyStroke(1, 3));
-    EXPECT_NE(KeyStroke(1, 2), KeyStroke(3, 2));
+TEST(UUID, IsOrderedByUnsignedBytes) {
+    EXPECT_TRUE(withByte(0, 0x7f) < withByte(0, 0x80));
+    EXPECT_FALSE(withByte(0, 0x80) < withByte(0, 0x7f));
+    EXPECT_TRUE(withByte(15, 1) < withByte(15, 0xff));
 }
 
-TEST(ValueTypes, LieInMemoryAsTheyLieOnDisk) {
-    EXPECT_EQ(raw(Point(1, -1)), hex("01000000 ffffffff"));
-    EXPECT_EQ(raw(Rect(1, 2, 3, 4)), hex("01000000 02000000 03000000 04000000"));
-    EXPECT_EQ(raw(KeyStroke(0x41, 0x20000)), hex("41000000 00000200"));
+TEST(UUID, IsOrderedAsItsText) {
+    const std::vector<std::string> texts = {
+        "00000000-0000-0000-0000-000000000000", "00000000-0000-0000-0000-000000000001",
+        "00000001-0000-0000-0000-000000000000", "2b7b6a00-7a1f-11e2-83d0-0017f200be7f",
+        "2b7b6aef-7a1f-11e2-83d0-0017f200be7f", "2b7b6af0-7a1f-11e2-83d0-0017f200be7f",
+        "2b7b6af0-7a1f-11e2-83d0-0017f200be80", "80000000-0000-0000-0000-000000000000",
+        "a0000000-0000-0000-0000-000000000000", "ffffffff-ffff-ffff-ffff-ffffffffffff",
+    };
+    for (const std::string& left : texts)
+        for (const std::string& right : texts)
+            EXPECT_EQ(parsed(left) < parsed(right), left < right) << left << ' ' << right;
 }
 
-TEST(ValueTypes, PrintTheirFields) {
-    EXPECT_EQ(textOf(Point(10, -4)), "(10,-4)");
-    EXPECT_EQ(textOf(Rect(1, -2, 3, -4)), "(1,-2,3,-4)");
-    EXPECT_EQ(textOf(KeyStroke(65, 0xffffffff)), "(65,4294967295)");
+TEST(UUIDText, HasFiveGroupsOfLowerCaseDigits) {
+    EXPECT_EQ(printed(s_id), "2b7b6af1-7a1f-11e2-83d0-0017f200be7f");
+    EXPECT_EQ(printed(uuid{}), "00000000-0000-0000-0000-000000000000");
+    EXPECT_EQ(printed(withByte(15, 0x0a)), "00000000-0000-0000-0000-00000000000a");
+    EXPECT_EQ(printed(uuid{{0xff, 0xee, 0xdd, 0xcc, 0xbb, 0xaa, 0x99, 0x88, 0x77, 0x66, 0x55, 0x44, 0x33, 0x22, 0x11,
+                            0x0f}}),
+              "ffeeddcc-bbaa-9988-7766-55443322110f");
 }
 
-TEST(CursorImage, PrintsItsDefaults) {
-    EXPECT_EQ(textOf(CursorImage()), "(0,0,0,0,0,-1,3)");
+TEST(UUIDText, LeavesTheStreamPrintingHexadecimalNumbersFilledWithZeros) {
+    std::ostringstream out;
+    out << std::dec << std::setfill('*') << s_id << ' ' << 255 << ' ' << std::setw(4) << 10;
+    EXPECT_EQ(out.str(), std::string(s_idText) + " ff 000a");
+    EXPECT_EQ(out.fill(), '0');
 }
 
-TEST(CursorImage, PrintsTheAddressOfItsBytesAsANumber) {
-    const CursorImage image = imageOf("ab");
-    const auto address = std::to_string(reinterpret_cast<std::intptr_t>(image.imageData));
-    EXPECT_EQ(textOf(image), "(7,-3,4,2," + address + ",5,9)");
+TEST(UUIDText, IsReadBack) {
+    EXPECT_EQ(parsed(s_idText), s_id);
+    EXPECT_EQ(parsed("00000000-0000-0000-0000-000000000001"), withByte(15, 1));
+    EXPECT_EQ(parsed("ffeeddcc-bbaa-9988-7766-55443322110f"),
+              (uuid{{0xff, 0xee, 0xdd, 0xcc, 0xbb, 0xaa, 0x99, 0x88, 0x77, 0x66, 0x55, 0x44, 0x33, 0x22, 0x11, 0x0f}}));
 }
 
-TEST(CursorImage, CopiesItsBytes) {
-    const CursorImage original = imageOf("bytes");
-    const CursorImage copy(original);
-    EXPECT_EQ(copy, original);
-    EXPECT_NE(copy.imageData, original.imageData);
-    EXPECT_EQ(bytesOf(copy), "bytes");
+TEST(UUIDText, MayBeInUpperCase) {
+    EXPECT_EQ(parsed("2B7B6AF1-7A1F-11E2-83D0-0017F200BE7F"), s_id);
 }
 
-TEST(CursorImage, AssignmentReleasesWhatWasThereBefore) {
-    CursorImage target = imageOf("long bytes from before");
-    target = imageOf("new");
-    EXPECT_EQ(bytesOf(target), "new");
-    const CursorImage without;
-    target = without;
-    EXPECT_EQ(target.imageData, nullptr);
-    EXPECT_EQ(target, CursorImage());
+TEST(UUIDText, MayHaveAnySeparators) {
+    for (const char separator : {'x', ' ', '\n', '0', '\0'}) {
+        std::string text = s_idText;
+        std::replace(text.begin(), text.end(), '-', separator);
+        EXPECT_EQ(parsed(text), s_id) << text;
+    }
 }
 
-TEST(CursorImage, AssignmentToItselfDoesNothing) {
-    CursorImage image = imageOf("bytes");
-    const auto* before = image.imageData;
-    auto& same = image;
-    image = same;
-    EXPECT_EQ(image.imageData, before);
-    EXPECT_EQ(bytesOf(image), "bytes");
-}
-
-TEST(CursorImage, ACopyOfASizeWithoutABufferHasNeither) {
-    CursorImage original;
-    original.imageDataSize = 10;
-    const CursorImage copy(original);
-    EXPECT_EQ(copy.imageDataSize, 0U);
-    EXPECT_EQ(copy.imageData, nullptr);
-}
-
-TEST(CursorImage, ACopyOfABufferWithoutASizeHasNeither) {
-    CursorImage original = imageOf("bytes");
-    original.imageDataSize = 0;
-    const CursorImage copy(original);
-    EXPECT_EQ(copy.imageData, nullptr);
-}
-
-TEST(CursorImage, MovingTakesTheBytesAlong) {
-    CursorImage original = imageOf("bytes");
-    const auto* bytes = original.imageData;
-    const CursorImage moved(std::move(original));
-    EXPECT_EQ(moved.imageData, bytes);
-    EXPECT_EQ(original.imageData, nullptr); // NOLINT(bugprone-use-after-move)
-    EXPECT_EQ(original.imageDataSize, 0U);
-}
-
-TEST(CursorImage, LettingGoWithoutFreeingLeavesTheBytesUntouched) {
-    unsigned char bytes[] = {1, 2, 3};
-    CursorImage image(1, 0, 0, bytes, 3, CursorTypeUnknown, CursorImage::DefaultFlags);
-    image.freeImageData(false);
-    EXPECT_EQ(image.imageData, nullptr);
-    EXPECT_EQ(image.imageDataSize, 0U);
-    EXPECT_EQ(bytes[2], 3);
-}
-
-TEST(CursorImage, LettingGoForgetsASizeWithoutABuffer) {
-    CursorImage image;
-    image.imageDataSize = 5;
-    image.freeImageData(true);
-    EXPECT_EQ(image.imageDataSize, 0U);
-}
-
-TEST(CursorImage, DiffersInAnyField) {
-    const CursorImage image = imageOf("ab");
-    std::vector<CursorImage> others(6, image);
-    others[0].uniqueId = 1;
-    others[1].hotspotOffsetX = 1;
-    others[2].hotspotOffsetY = 1;
-    others[3].cursorTypeId = CursorTypeUnknown;
-    others[4].flags = CursorImage::DefaultFlags;
-    others[5].imageData[1] = 'x';
-    for (const CursorImage& other : others)
-        EXPECT_TRUE(other != image && !(other == image));
-    EXPECT_NE(imageOf("ab"), imageOf("abc"));
-}
-
-TEST(CursorImage, EqualSizesWithoutABufferOnOneSideCompareByTheRest) {
-    const CursorImage with = imageOf("ab");
-    CursorImage without = imageOf("ab");
-    std::free(std::exchange(without.imageData, nullptr));
-    EXPECT_EQ(with, without);
-    EXPECT_EQ(without, with);
-    without.uniqueId = 8;
-    EXPECT_NE(with, without);
-}
-
-TEST(UUID, PrintsInGroupsOfLowerCaseDigits) {
-    uuid id{};
-    std::memcpy(id.data, s_bytes.data(), 16);
-    EXPECT_EQ(textOf(id), s_text);
-    EXPECT_EQ(textOf(uuid{}), "00000000-0000-0000-0000-000000000000");
-}
-
-TEST(UUID, PrintingLeavesTheStreamInHexadecimalFilledWithZeros) {
-    std::ostringstream stream;
-    stream << uuid{} << ' ' << 255 << ' ' << std::setw(4) << 10;
-    EXPECT_EQ(stream.str().substr(36), " ff 000a");
-}
-
-TEST(UUID, PrintsTheSameWhateverTheStreamWasSetTo) {
-    std::ostringstream stream;
-    stream << std::uppercase << std::showbase << std::left << std::setw(50) << std::setfill('*') << parsed(s_text);
-    EXPECT_EQ(stream.str(), s_text);
-}
-
-TEST(UUID, ParsesWhatItPrints) {
-    EXPECT_EQ(std::string(reinterpret_cast<const char*>(parsed(s_text).data), 16), s_bytes);
-    EXPECT_EQ(textOf(parsed("2B7B6AF1-7A1F-11E2-83D0-0017F200BE7F")), s_text);
-}
-
-TEST(UUID, ParsesWithAnySeparator) {
-    EXPECT_EQ(parsed("2b7b6af1x7a1f 11e2\n83d000017f200be7f"), parsed(s_text));
-}
-
-TEST(UUID, ParsingTakesExactly36Characters) {
-    std::istringstream stream(s_text + "rest");
+TEST(UUIDText, IsThirtySixCharactersOfWhateverFollows) {
+    std::istringstream stream(std::string(s_idText) + "-rest");
     uuid id{};
     stream >> id;
-    std::string rest;
-    stream >> rest;
-    EXPECT_EQ(rest, "rest");
+    EXPECT_EQ(id, s_id);
+    EXPECT_EQ(stream.tellg(), 36);
+    EXPECT_EQ(stream.get(), '-');
 }
 
-TEST(UUID, ParsingAShortTextFailsAndKeepsWhatWasThere) {
+TEST(UUIDText, MayEndWithTheInput) {
+    std::istringstream stream(s_idText);
+    uuid id{};
+    EXPECT_TRUE(stream >> id);
+    EXPECT_TRUE(stream.good());
+}
+
+TEST(UUIDText, IsReadOneBehindTheOther) {
+    std::istringstream stream(std::string(s_idText) + "00000000-0000-0000-0000-000000000001");
+    uuid first{};
+    uuid second{};
+    EXPECT_TRUE(stream >> first >> second);
+    EXPECT_EQ(first, s_id);
+    EXPECT_EQ(second, withByte(15, 1));
+}
+
+TEST(UUIDText, CountsWhiteSpaceInsteadOfSkippingIt) {
+    std::istringstream stream(" 1" + std::string(s_idText).substr(2) + "rest");
+    uuid id{};
+    stream >> id;
+    EXPECT_EQ(id.data[0], 1);
+    EXPECT_EQ(id.data[15], 0x7f);
+    EXPECT_EQ(stream.get(), 'r');
+}
+
+TEST(UUIDText, TakesTheLeadingDigitsOfEveryPair) {
+    EXPECT_EQ(firstByteOf("1g"), 1);
+    EXPECT_EQ(firstByteOf("g1"), 0);
+    EXPECT_EQ(firstByteOf("zz"), 0);
+    EXPECT_EQ(firstByteOf(" 1"), 1);
+    EXPECT_EQ(firstByteOf("1 "), 1);
+    EXPECT_EQ(firstByteOf("-1"), 0xff);
+    EXPECT_EQ(firstByteOf("-f"), 0xf1);
+    EXPECT_EQ(firstByteOf("+a"), 0x0a);
+    EXPECT_EQ(firstByteOf("0x"), 0);
+}
+
+TEST(UUIDText, ThatIsTooShortFailsTheStreamAndKeepsWhatWasRead) {
     std::istringstream stream("2b7b6");
     uuid id{};
-    std::memset(id.data, 0xee, 16);
     stream >> id;
     EXPECT_TRUE(stream.fail());
-    EXPECT_EQ(textOf(id), "2b7b0600-0000-0000-0000-000000000000");
+    EXPECT_EQ(id.data[0], 0x2b);
+    EXPECT_EQ(id.data[1], 0x7b);
+    EXPECT_EQ(id.data[2], 6);
 }
 
-TEST(UUID, HexPairsCountAsFarAsTheyAreValid) {
-    EXPECT_EQ(uuid::hexCharsToUint8("ff"), 0xff);
-    EXPECT_EQ(uuid::hexCharsToUint8("A0"), 0xa0);
+TEST(UUIDText, ThatLacksAnyOfItsCharactersFailsTheStream) {
+    for (std::size_t length = 0; length < 36; ++length) {
+        std::istringstream stream(std::string(s_idText).substr(0, length));
+        uuid id{};
+        EXPECT_FALSE(stream >> id) << length;
+    }
+}
+
+TEST(HexChars, AreConvertedAsANumberOfBase16) {
+    EXPECT_EQ(uuid::hexCharsToUint8("00"), 0);
+    EXPECT_EQ(uuid::hexCharsToUint8("0f"), 15);
+    EXPECT_EQ(uuid::hexCharsToUint8("f0"), 240);
+    EXPECT_EQ(uuid::hexCharsToUint8("9a"), 0x9a);
+    EXPECT_EQ(uuid::hexCharsToUint8("FF"), 255);
+}
+
+TEST(HexChars, CountAsFarAsTheyAreValid) {
     EXPECT_EQ(uuid::hexCharsToUint8("1g"), 1);
     EXPECT_EQ(uuid::hexCharsToUint8("g1"), 0);
     EXPECT_EQ(uuid::hexCharsToUint8(" 1"), 1);
-    EXPECT_EQ(uuid::hexCharsToUint8("-1"), 0xff);
-    EXPECT_EQ(uuid::hexCharsToUint8("+a"), 0x0a);
-    EXPECT_EQ(uuid::hexCharsToUint8("0x"), 0);
-    EXPECT_EQ(uuid::hexCharsToUint8("12345"), 0x12);
+    EXPECT_EQ(uuid::hexCharsToUint8("-1"), 255);
+    EXPECT_EQ(uuid::hexCharsToUint8("+a"), 10);
+    EXPECT_EQ(uuid::hexCharsToUint8("--"), 0);
+    EXPECT_EQ(uuid::hexCharsToUint8("  "), 0);
+}
+
+TEST(HexChars, AreTheFirstTwoOfALongerText) {
+    EXPECT_EQ(uuid::hexCharsToUint8("2b7b6af1"), 0x2b);
+    EXPECT_EQ(uuid::hexCharsToUint8("012"), 1);
+}
+
+TEST(HexChars, MayBeLessThanTwo) {
     EXPECT_EQ(uuid::hexCharsToUint8("7"), 7);
     EXPECT_EQ(uuid::hexCharsToUint8(""), 0);
 }
 
-TEST(UUID, HexPairsAreReadFromAStreamWithTheirWhiteSpace) {
-    std::istringstream stream(" 1-1+af");
-    EXPECT_EQ(uuid::readUint8FromHexChars(stream), 1);
-    EXPECT_EQ(uuid::readUint8FromHexChars(stream), 0xff);
-    EXPECT_EQ(uuid::readUint8FromHexChars(stream), 0x0a);
-    EXPECT_EQ(uuid::readUint8FromHexChars(stream), 0x0f);
-    EXPECT_TRUE(stream.fail());
+TEST(HexChars, AreTakenFromAStreamInPairs) {
+    std::istringstream stream("2b7x z");
+    EXPECT_EQ(uuid::readUint8FromHexChars(stream), 0x2b);
+    EXPECT_EQ(uuid::readUint8FromHexChars(stream), 7);
+    EXPECT_EQ(uuid::readUint8FromHexChars(stream), 0);
+    EXPECT_EQ(stream.tellg(), 6);
+    EXPECT_TRUE(stream.good());
 }
 
-TEST(UUID, OrdersByItsBytesAsUnsignedNumbers) {
-    uuid last{};
-    last.data[15] = 1;
-    uuid third{};
-    third.data[3] = 1;
-    uuid high{};
-    high.data[0] = 0x80;
-    EXPECT_TRUE(uuid{} < last && last < third && third < high);
-    EXPECT_FALSE(last < last);
-    EXPECT_TRUE(last == last && !(last == third));
+TEST(HexChars, ThatAreMissingFailTheStream) {
+    std::istringstream stream("7");
+    EXPECT_EQ(uuid::readUint8FromHexChars(stream), 7);
+    EXPECT_TRUE(stream.fail());
+    EXPECT_EQ(uuid::readUint8FromHexChars(stream), 0);
+}
+
+TEST(SwapInt, IsToBeHadWithTheValues) {
+    EXPECT_EQ(ZULMetaData::swapInt(std::uint32_t{0x5a554c4d}), 0x4d4c555aU);
+    EXPECT_EQ(ZULMetaData::swapInt(std::uint64_t{24}), 0x1800000000000000U);
 }
 
 } // namespace
 
-} // namespace ZULMetaData
+} // namespace ZULMetaData::Test

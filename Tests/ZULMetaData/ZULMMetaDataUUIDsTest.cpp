@@ -1,113 +1,189 @@
+// The header of a stream and the registry of kinds.
+
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
 
 #include "Tests/Support/Bytes.h"
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <cstddef>
+#include <cstring>
+#include <iostream>
+#include <set>
 #include <sstream>
-#include <tuple>
+#include <string>
+#include <utility>
 #include <vector>
 
-namespace ZULMetaData {
+namespace ZULMetaData::Test {
 
 namespace {
 
-using namespace Test;
+// ---- The header -----------------------------------------------------------------------------------------------
 
-using testing::internal::CaptureStdout;
-using testing::internal::GetCapturedStdout;
-
-std::string bytesOf(const uuid& type) {
-    return {reinterpret_cast<const char*>(type.data), sizeof type.data};
+TEST(MetaDataHeader, BeginsWithoutAKindAndOfNoVersion) {
+    EXPECT_EQ(raw(MetaDataHeader()), std::string(16, '\0') + hex("ffffffff 00000000"));
 }
 
-struct Row {
+TEST(MetaDataHeader, IsTwentyFourBytesWithoutPadding) {
+    const MetaDataHeader header{s_cursorLocationUUID, 0x01020304, 0x11121314};
+    EXPECT_EQ(raw(header), hex("2b7b6af2 7a1f 11e2 83d0 0017f200be7f 04030201 14131211"));
+    EXPECT_EQ(s_metaDataHeaderSize, 24U);
+}
+
+// ---- The kinds ------------------------------------------------------------------------------------------------
+
+struct Kind {
     const char* name;
-    const char* firstGroup;
     uuid constant;
+    const char* identifier;
     int version;
 };
 
-const std::vector<Row> s_rows{
-    {"caretPosition", "2b7b6aef", s_caretPositionUUID, 1},
-    {"cursorAction", "2b7b6af0", s_cursorActionUUID, 1},
-    {"cursorImage", "2b7b6af1", s_cursorImageUUID, 2},
-    {"cursorLocation", "2b7b6af2", s_cursorLocationUUID, 1},
-    {"cursorOpacity", "2b7b6af3", s_cursorOpacityUUID, 1},
-    {"keyboardAction", "2b7b6af5", s_keyboardActionUUID, 1},
-    {"recordingRegion", "2b7b6af6", s_recordingRegionUUID, 1},
-    {"topmostWindow", "2b7b6af7", s_topmostWindowUUID, 1},
-    {"slideTitles", "2b7b6af8", s_slideTitlesUUID, 1},
-    {"slideText", "2b7b6af9", s_slideTextUUID, 1},
-    {"slideComment", "2b7b6afa", s_slideCommentUUID, 1},
-    {"recordingScaleFactor", "2b7b6afb", s_recordingScaleFactorUUID, 1},
-    {"systemData", "2b7b6afc", s_systemDataUUID, 1},
-    {"miscellany", "2b7b6a00", s_miscellanyUUID, 1},
-    {"recordingCutTimes", "2b7b6a01", s_recordingCutTimesUUID, 1},
-    {"deviceFrameCoordinates", "2b7b6a02", s_deviceFrameCoordinatesUUID, 1},
-    {"deviceFrameAspectRatio", "2b7b6a03", s_deviceFrameAspectRatioUUID, 1},
-    {"deviceFrameDisplayNames", "2b7b6a04", s_deviceFrameDisplayNamesUUID, 1},
-    {"scrollAction", "2b7b6a05", s_scrollActionUUID, 1},
-    {"topmostAppName", "2b7b6a06", s_topmostAppNameUUID, 1},
-    {"topmostWindowTitle", "2b7b6a07", s_topmostWindowTitleUUID, 1},
-    {"cpuUsage", "2b7b6a08", s_cpuUsageUUID, 1},
-    {"hoverRect", "2b7b6a09", s_hoverRectUUID, 1},
+const std::vector<Kind> s_kinds = {
+    {"caretPosition", s_caretPositionUUID, "2b7b6aef-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"cursorAction", s_cursorActionUUID, "2b7b6af0-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"cursorImage", s_cursorImageUUID, "2b7b6af1-7a1f-11e2-83d0-0017f200be7f", 2},
+    {"cursorLocation", s_cursorLocationUUID, "2b7b6af2-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"cursorOpacity", s_cursorOpacityUUID, "2b7b6af3-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"keyboardAction", s_keyboardActionUUID, "2b7b6af5-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"recordingRegion", s_recordingRegionUUID, "2b7b6af6-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"topmostWindow", s_topmostWindowUUID, "2b7b6af7-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"slideTitles", s_slideTitlesUUID, "2b7b6af8-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"slideText", s_slideTextUUID, "2b7b6af9-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"slideComment", s_slideCommentUUID, "2b7b6afa-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"recordingScaleFactor", s_recordingScaleFactorUUID, "2b7b6afb-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"systemData", s_systemDataUUID, "2b7b6afc-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"miscellany", s_miscellanyUUID, "2b7b6a00-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"recordingCutTimes", s_recordingCutTimesUUID, "2b7b6a01-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"deviceFrameCoordinates", s_deviceFrameCoordinatesUUID, "2b7b6a02-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"deviceFrameAspectRatio", s_deviceFrameAspectRatioUUID, "2b7b6a03-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"deviceFrameDisplayNames", s_deviceFrameDisplayNamesUUID, "2b7b6a04-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"scrollAction", s_scrollActionUUID, "2b7b6a05-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"topmostAppName", s_topmostAppNameUUID, "2b7b6a06-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"topmostWindowTitle", s_topmostWindowTitleUUID, "2b7b6a07-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"cpuUsage", s_cpuUsageUUID, "2b7b6a08-7a1f-11e2-83d0-0017f200be7f", 1},
+    {"hoverRect", s_hoverRectUUID, "2b7b6a09-7a1f-11e2-83d0-0017f200be7f", 1},
 };
 
-TEST(KindRegistry, HoldsEveryKindInOrderWithItsIdentifierAndVersion) {
-    ASSERT_EQ(s_metaDataKinds.size(), s_rows.size());
-    for (std::size_t i = 0; i < s_rows.size(); ++i) {
-        const Row& row = s_rows[i];
-        EXPECT_EQ(s_metaDataKinds[i].name, row.name);
-        EXPECT_EQ(s_metaDataKinds[i].currentVersion, row.version) << row.name;
-        EXPECT_EQ(bytesOf(row.constant), hex(row.firstGroup) + hex("7a1f11e283d00017f200be7f")) << row.name;
-        EXPECT_EQ(s_metaDataKinds[i].type, row.constant) << row.name;
-        EXPECT_EQ(MetaDataUUID::currentVersionForUUID(row.constant), row.version) << row.name;
-        EXPECT_EQ(findMetaDataKind(row.constant), &s_metaDataKinds[i]) << row.name;
+/// Counts how often the program made sure that its output is out.
+class FlushCounter : public std::stringbuf {
+public:
+    FlushCounter() : original_(std::cout.rdbuf(this)) {}
+    ~FlushCounter() override { std::cout.rdbuf(original_); }
+
+    int flushes = 0;
+
+protected:
+    int sync() override {
+        ++flushes;
+        return 0;
+    }
+
+private:
+    std::streambuf* original_;
+};
+
+std::pair<int, std::string> versionAndOutputFor(const uuid& type) {
+    testing::internal::CaptureStdout();
+    const int version = MetaDataUUID::currentVersionForUUID(type);
+    return {version, testing::internal::GetCapturedStdout()};
+}
+
+/// Of an identifier's text.
+std::string bytesOf(std::string text) {
+    text.erase(std::remove(text.begin(), text.end(), '-'), text.end());
+    return hex(text);
+}
+
+uuid identifier(const std::string& text) {
+    uuid id{};
+    std::memcpy(id.data, bytesOf(text).data(), sizeof id.data);
+    return id;
+}
+
+TEST(Kinds, HaveTheirIdentifiers) {
+    for (const Kind& kind : s_kinds)
+        EXPECT_EQ(raw(kind.constant), bytesOf(kind.identifier)) << kind.name;
+}
+
+TEST(Kinds, HaveTheirCurrentVersionsAndSayNothing) {
+    for (const Kind& kind : s_kinds) {
+        const auto [version, output] = versionAndOutputFor(kind.constant);
+        EXPECT_EQ(version, kind.version) << kind.name;
+        EXPECT_EQ(output, "") << kind.name;
     }
 }
 
-TEST(KindRegistry, LeavesTheGapInTheNumberingToNobody) {
-    EXPECT_EQ(findMetaDataKind(detail::kindUUID(0x2b7b6af4)), nullptr);
-    EXPECT_EQ(findMetaDataKind(uuid{}), nullptr);
+TEST(Kinds, AreRegisteredInThisOrder) {
+    ASSERT_EQ(s_metaDataKinds.size(), s_kinds.size());
+    for (std::size_t index = 0; index < s_kinds.size(); ++index) {
+        EXPECT_EQ(s_metaDataKinds[index].name, s_kinds[index].name);
+        EXPECT_EQ(raw(s_metaDataKinds[index].type), bytesOf(s_kinds[index].identifier));
+        EXPECT_EQ(s_metaDataKinds[index].currentVersion, s_kinds[index].version);
+    }
 }
 
-TEST(KindRegistry, HasTheCursorImageIdentifierAsText) {
-    std::ostringstream text;
-    text << s_cursorImageUUID;
-    EXPECT_EQ(text.str(), s_cursorImageUUIDAsString);
+TEST(Kinds, AreFoundByTheirIdentifier) {
+    for (const Kind& kind : s_kinds) {
+        const MetaDataKind* const found = findMetaDataKind(identifier(kind.identifier));
+        ASSERT_NE(found, nullptr) << kind.name;
+        EXPECT_EQ(found->name, kind.name);
+    }
+}
+
+TEST(Kinds, DifferFromEachOther) {
+    std::set<uuid> identifiers;
+    for (const Kind& kind : s_kinds)
+        identifiers.insert(kind.constant);
+    EXPECT_EQ(identifiers.size(), 23U);
+}
+
+TEST(Kinds, HaveTheCursorImageAsText) {
     EXPECT_STREQ(s_cursorImageUUIDAsString, "2b7b6af1-7a1f-11e2-83d0-0017f200be7f");
 }
 
-TEST(KindRegistry, SaysOnStandardOutputThatAKindIsUnknown) {
-    CaptureStdout();
-    const int version = MetaDataUUID::currentVersionForUUID(detail::kindUUID(0x2b7b6af4));
-    EXPECT_EQ(GetCapturedStdout(), "MetaDataUUID::currentVersionForUUID - unsupported UUID = "
-                                   "2b7b6af4-7a1f-11e2-83d0-0017f200be7f\n");
-    EXPECT_EQ(version, -1);
+// ---- Unknown kinds --------------------------------------------------------------------------------------------
+
+/// Nobody's, among them the gap in the numbering and neighbours of it and of its ends.
+const std::vector<std::string> s_unknown = {
+    "00000000-0000-0000-0000-000000000000", "2b7b6af4-7a1f-11e2-83d0-0017f200be7f",
+    "2b7b6aee-7a1f-11e2-83d0-0017f200be7f", "2b7b6afd-7a1f-11e2-83d0-0017f200be7f",
+    "2b7b6a0a-7a1f-11e2-83d0-0017f200be7f", "2b7b69ff-7a1f-11e2-83d0-0017f200be7f",
+    "2b7b6af1-7a1f-11e2-83d0-0017f200be7e", "2b7b6af1-7a1e-11e2-83d0-0017f200be7f",
+};
+
+TEST(UnknownKind, HasNoVersionAndIsReported) {
+    for (const std::string& id : s_unknown) {
+        const auto [version, output] = versionAndOutputFor(identifier(id));
+        EXPECT_EQ(version, -1) << id;
+        EXPECT_EQ(output, "MetaDataUUID::currentVersionForUUID - unsupported UUID = " + id + "\n");
+    }
 }
 
-TEST(KindRegistry, SaysNothingOfAKindThatItHolds) {
-    CaptureStdout();
-    MetaDataUUID::currentVersionForUUID(s_hoverRectUUID);
-    EXPECT_EQ(GetCapturedStdout(), "");
+TEST(UnknownKind, IsReportedEveryTimeItIsAskedFor) {
+    testing::internal::CaptureStdout();
+    MetaDataUUID::currentVersionForUUID(uuid{});
+    MetaDataUUID::currentVersionForUUID(uuid{});
+    EXPECT_EQ(testing::internal::GetCapturedStdout(),
+              "MetaDataUUID::currentVersionForUUID - unsupported UUID = 00000000-0000-0000-0000-000000000000\n"
+              "MetaDataUUID::currentVersionForUUID - unsupported UUID = 00000000-0000-0000-0000-000000000000\n");
 }
 
-TEST(MetaDataHeader, IsUnreadAtFirst) {
-    const MetaDataHeader header;
-    EXPECT_EQ(header.uuid, uuid{});
-    EXPECT_EQ(header.version, -1);
-    EXPECT_EQ(header.fixedEntrySize, 0U);
+TEST(UnknownKind, IsReportedAtOnce) {
+    FlushCounter output;
+    MetaDataUUID::currentVersionForUUID(uuid{});
+    EXPECT_EQ(output.flushes, 1);
 }
 
-TEST(MetaDataHeader, Takes24BytesInTheOrderOfItsFields) {
-    MetaDataHeader header;
-    header.uuid = s_cursorLocationUUID;
-    header.version = 1;
-    header.fixedEntrySize = 16;
-    EXPECT_EQ(raw(header), streamHeader("2b7b6af2", 1, 16));
+TEST(UnknownKind, IsNotFound) {
+    testing::internal::CaptureStdout();
+    for (const std::string& id : s_unknown)
+        EXPECT_EQ(findMetaDataKind(identifier(id)), nullptr) << id;
+    EXPECT_EQ(testing::internal::GetCapturedStdout(), "");
 }
 
 } // namespace
 
-} // namespace ZULMetaData
+} // namespace ZULMetaData::Test

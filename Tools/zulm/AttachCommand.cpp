@@ -84,7 +84,7 @@ void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
         const auto [offset, length] = parser.fileDataForUUID(type);
         parser.getStream().clear();
         const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(parser.getStream()));
-        if (length >= s_negativeLength) {
+        if (length < s_metaDataHeaderSize || length >= s_negativeLength) {
             complainAboutOldMovie(
                 options.from, fmt::format("{} at offset {} lies in an atom without room for it", nameOf(type), offset),
                 streams);
@@ -159,7 +159,9 @@ ExitCode runAttach(const AttachOptions& options) {
     requireMovie(options.save.movie);
     const Streams streams = takeStreams(options);
     if (streams.sources.empty()) {
-        complain(fmt::format("{}: no recording metadata in it; nothing was written", options.from));
+        complain(fmt::format("{}: {}; nothing was written", options.from,
+                             streams.code == ExitFine ? "no recording metadata in it"
+                                                      : "no stream in it can be carried over"));
         return worseOf(streams.code, ExitNoMetaData);
     }
     std::vector<std::string> inputs = options.streams;

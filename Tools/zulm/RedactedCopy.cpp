@@ -46,7 +46,7 @@ void copyBytes(const ReadBytes& read, std::uint64_t offset, std::uint64_t size, 
 
 template <std::size_t size>
 void writeBytes(std::ostream& output, const std::array<char, size>& bytes) {
-    output.write(bytes.data(), bytes.size());
+    output.write(bytes.data(), static_cast<std::streamsize>(size));
 }
 
 /// The file ends where it was written or skipped to.

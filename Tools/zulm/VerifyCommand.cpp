@@ -99,6 +99,8 @@ Json fileDocument(const std::string& name, const ValidationReport& report) {
 void advise(const std::string& name, const ValidationReport& report) {
     if (std::ranges::any_of(report.findings, [](const Finding& f) { return f.code == FindingCode::OpenEndedAtom; }))
         warn(fmt::format("{}: 'zulm repair --dry-run {}' says whether its last atom can be closed", name, name));
+    if (!std::ranges::all_of(report.streams, &StreamReport::isReachable))
+        warn(fmt::format("{}: 'zulm salvage {} -o DIR' writes out the streams that no reader finds", name, name));
 }
 
 ExitCode runVerify(const VerifyOptions& options) {

@@ -2,7 +2,6 @@
 
 #include "ZULMetaData/AtomFormat.h"
 
-#include <ranges>
 
 namespace ZULMetaData {
 
@@ -40,8 +39,8 @@ std::uint64_t MovieTransaction::endAtom() {
 void MovieTransaction::undo() {
     file_.truncate(oldSize_);
     file_.sync(); // an open end put back too early would swallow what is still behind it
-    for (const RepairChange& change : applied_ | std::views::reverse)
-        file_.writeAt(change.offset, change.before);
+    for (auto change = applied_.rbegin(); change != applied_.rend(); ++change)
+        file_.writeAt(change->offset, change->before);
     file_.sync();
     applied_.clear();
     end_ = oldSize_;

@@ -1,0 +1,189 @@
+// What all commands have in common: help, wrong arguments, colour, progress, outputs that fail.
+
+#include "Tests/Tools/OddFiles.h"
+#include "Tests/Tools/ToolRun.h"
+
+#include <gmock/gmock.h>
+
+#include <csignal>
+
+namespace ZULMetaData::Test {
+namespace {
+
+using testing::AllOf;
+using testing::HasSubstr;
+using testing::Not;
+using testing::StartsWith;
+
+constexpr auto s_escape = "\x1b[";
+
+class CommandLine : public RecordedSession {
+protected:
+    void expectRefused(const std::vector<std::string>& arguments, const std::string& message) const {
+        const ToolResult result = runTool(arguments);
+        EXPECT_EQ(result.exitCode, 2) << message;
+        EXPECT_EQ(result.output, "");
+        EXPECT_THAT(result.errors, AllOf(StartsWith("zulm: "), HasSubstr(message), HasSubstr("--help' shows")));
+    }
+
+    std::string damaged() const {
+        writeFile(folder / "torn.dat", locations() + "1234");
+        return folder / "torn.dat";
+    }
+};
+
+TEST_F(CommandLine, HelpGroupsTheCommandsAndEndsWellOnStandardOutput) {
+    const ToolResult result = runTool({"--help"});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_EQ(result.errors, "");
+    for (const std::string part : {"\nLook\n  info ", "\nCheck and rescue\n  verify ", "\nChange\n  attach ",
+                                   "\nConvert\n  extract ", "\nExamples\n  zulm ", "\nExit codes\n  0 ", "--json"})
+        EXPECT_THAT(result.output, HasSubstr(part));
+}
+
+TEST_F(CommandLine, HelpOfEveryCommandHasItsUsageAndAnExample) {
+    for (const std::string command : {"info", "atoms", "dump", "diff", "grep", "verify", "repair", "salvage", "attach",
+                                      "stamp", "redact", "extract", "convert", "demo"}) {
+        const ToolResult result = runTool({command, "--help"});
+        EXPECT_EQ(result.exitCode, 0);
+        EXPECT_THAT(result.output, HasSubstr("\nUsage: zulm " + command + " [OPTIONS]"));
+        EXPECT_THAT(result.output, testing::ContainsRegex("\nExamples?\n  zulm " + command));
+    }
+}
+
+TEST_F(CommandLine, TellsItsVersion) {
+    EXPECT_THAT(runTool({"--version"}).output, StartsWith("zulm 0."));
+}
+
+TEST_F(CommandLine, RefusesWrongArguments) {
+    expectRefused({}, "which command?");
+    expectRefused({"--quiet"}, "which command?");
+    expectRefused({"inof", "a.mp4"}, "no command is called inof; did you mean info?");
+    expectRefused({"xyzzy"}, "no command is called xyzzy\n");
+    expectRefused({"info"}, "FILE is required");
+    expectRefused({"info", "--jsno", "a.mp4"}, "no option is called --jsno; did you mean --json?");
+    expectRefused({"info", "--no-progres", "a.mp4"}, "did you mean --no-progress?");
+    expectRefused({"dump", "a.mp4", "b.mp4"}, "b.mp4 is one argument too many");
+    expectRefused({"dump", "--format", "jsn", "a.mp4"},
+                  "--format: jsn is none of text, json, ndjson, csv; did you mean json?");
+    expectRefused({"dump", "--from", "soon", "a.mp4"}, "--from: soon is no number of seconds");
+    expectRefused({"dump", "--from", "inf", "a.mp4"}, "--from: inf is no number of seconds");
+    expectRefused({"dump", "--from", "2", "--to", "1", "a.mp4"}, "--from: 2 is later than --to 1");
+    expectRefused({"info", "--color", "sometimes", "a.mp4"}, "--color: sometimes is none of auto, always, never");
+    expectRefused({"info", "-q", "-v", "a.mp4"}, "excludes");
+    expectRefused({"--generate", "pdf"}, "nothing is generated as pdf");
+}
+
+TEST_F(CommandLine, TakesAFileThatIsNamedLikeACommand) {
+    writeFile(folder / "info", "");
+    ToolOptions options;
+    options.folder = folder.path().string();
+    EXPECT_THAT(runTool({"info", "info"}, options).errors, HasSubstr("info: not a movie"));
+}
+
+TEST_F(CommandLine, TakesOptionsOfEveryCommandOnEitherSideOfIt) {
+    for (const auto& arguments : {std::vector<std::string>{"--quiet", "info", damaged()}, {"info", damaged(), "-q"}})
+        EXPECT_EQ(runTool(arguments).errors, "");
+}
+
+TEST_F(CommandLine, SaysWhatItDoesWhenVerbose) {
+    const ToolResult result = runTool({"--verbose", "dump", "--stream", "cpuUsage", movie()});
+    EXPECT_THAT(result.errors, HasSubstr("movie with 17 streams"));
+    EXPECT_THAT(result.errors, HasSubstr("40 entries of cpuUsage read"));
+    EXPECT_EQ(runTool({"dump", "--stream", "cpuUsage", movie()}).errors, "");
+}
+
+TEST_F(CommandLine, ColoursHeadingsOnATerminal) {
+    ToolOptions options;
+    options.output = Channel::Terminal;
+    options.environment = {{"TERM", "xterm"}, {"NO_COLOR", ""}};
+    EXPECT_THAT(runTool({"info", movie()}, options).output, HasSubstr(s_escape));
+    EXPECT_THAT(runTool({"--color", "never", "info", movie()}, options).output, Not(HasSubstr(s_escape)));
+    options.environment = {{"TERM", "xterm"}, {"NO_COLOR", "1"}};
+    EXPECT_THAT(runTool({"info", movie()}, options).output, Not(HasSubstr(s_escape)));
+    options.environment = {{"TERM", "dumb"}, {"NO_COLOR", ""}};
+    EXPECT_THAT(runTool({"info", movie()}, options).output, Not(HasSubstr(s_escape)));
+}
+
+TEST_F(CommandLine, ColoursAPipeOnlyWhenToldTo) {
+    EXPECT_THAT(runTool({"info", movie()}).output, Not(HasSubstr(s_escape)));
+    EXPECT_THAT(runTool({"info", "--color", "always", movie()}).output, HasSubstr(s_escape));
+    EXPECT_THAT(runTool({"info", damaged(), "--color", "always"}).errors, HasSubstr(s_escape));
+    EXPECT_THAT(runTool({"info", damaged()}).errors, Not(HasSubstr(s_escape)));
+    EXPECT_THAT(runTool({"info", "--json", "--color", "always", movie()}).output, Not(HasSubstr(s_escape)));
+}
+
+TEST_F(CommandLine, ShowsProgressOnATerminalOnly) {
+    std::string stream = streamHeader("2b7b6af2", 1, 16);
+    for (int i = 0; i < 400000; ++i)
+        stream += pointEntry(i, i, i);
+    writeFile(folder / "many.dat", stream);
+    const std::vector<std::string> dump{"dump", "--format", "ndjson", folder / "many.dat"};
+    const auto withOption = [&](const std::string& option) {
+        auto arguments = dump;
+        arguments.push_back(option);
+        return arguments;
+    };
+    ToolOptions options;
+    options.errors = Channel::Terminal;
+    EXPECT_THAT(runTool(dump, options).errors,
+                testing::ContainsRegex("reading cursorLocation: [0-9.]+ MB of 6.4 MB \\([0-9]+ %\\), [0-9]+ s left"));
+    EXPECT_EQ(runTool(withOption("--no-progress"), options).errors, "");
+    EXPECT_EQ(runTool(withOption("--quiet"), options).errors, "");
+    EXPECT_EQ(runTool(dump).errors, "");
+}
+
+TEST_F(CommandLine, FailsWhenTheDiskIsFull) {
+    ToolOptions options;
+    options.output = Channel::FullDisk;
+    for (const auto& arguments : {std::vector<std::string>{"info", movie()},
+                                  {"info", "--json", movie()},
+                                  {"atoms", movie()},
+                                  {"dump", movie()},
+                                  {"--help"},
+                                  {"--version"},
+                                  {"--generate", "man"}}) {
+        const ToolResult result = runTool(arguments, options);
+        EXPECT_EQ(result.exitCode, 1) << arguments.front();
+        EXPECT_EQ(result.errors, "zulm: standard output: cannot be written: No space left on device\n");
+    }
+}
+
+TEST_F(CommandLine, FailsQuietlyWhenNobodyListens) {
+    ToolOptions options;
+    options.output = Channel::Closed;
+    const ToolResult closed = runTool({"dump", movie()}, options);
+    EXPECT_EQ(closed.exitCode, 1);
+    EXPECT_EQ(closed.errors, "");
+    options.output = Channel::BrokenPipe;
+    const ToolResult broken = runTool({"dump", movie()}, options);
+    EXPECT_EQ(broken.exitCode, 128 + SIGPIPE);
+    EXPECT_EQ(broken.errors, "");
+    const ToolResult ignored = runProgram(
+        "bash", {"-c", "trap '' PIPE; set -o pipefail; '" ZULM_PATH "' dump --format json '" + movie() + "' | true"});
+    EXPECT_EQ(ignored.exitCode, 1);
+    EXPECT_EQ(ignored.errors, "");
+}
+
+TEST_F(CommandLine, KeepsWhatItPrintsOutOfTheFilesThatItOpens) {
+    const std::string copy = copyOf(movie());
+    const std::string before = contentsOf(copy);
+    ToolOptions options;
+    options.output = Channel::Closed;
+    options.errors = Channel::Closed;
+    runTool({"-v", "attach", copy, streamFile("cpuUsage"), "--replace", "--in-place"}, options);
+    const std::string after = contentsOf(copy);
+    EXPECT_EQ(after.substr(0, before.size()), before);
+    EXPECT_THAT(after, Not(HasSubstr("zulm:")));
+}
+
+TEST_F(CommandLine, EndsWithTheNumberOfTheSignal) {
+    ToolOptions options;
+    options.input = std::string(1 << 20, 'x');
+    const ToolResult result = runProgram(
+        "bash", {"-c", "sleep 20 | '" ZULM_PATH "' info - & sleep 0.2; kill -INT $!; kill -TERM $!; wait $!"});
+    EXPECT_EQ(result.exitCode, 128 + SIGTERM); // a shell's background ignores SIGINT, and so does the tool then
+}
+
+} // namespace
+} // namespace ZULMetaData::Test

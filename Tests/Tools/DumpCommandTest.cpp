@@ -1,0 +1,283 @@
+// `zulm dump`: entries, in every format.
+
+#include "Tests/Tools/Golden.h"
+#include "Tests/Tools/OddFiles.h"
+#include "Tests/Tools/ToolRun.h"
+
+#include "Platform/Image.h"
+
+#include <gmock/gmock.h>
+#include <nlohmann/json.hpp>
+
+#include <cmath>
+#include <filesystem>
+#include <limits>
+#include <sstream>
+
+namespace ZULMetaData::Test {
+namespace {
+
+using nlohmann::json;
+using testing::HasSubstr;
+
+std::vector<std::string> linesOf(const std::string& text) {
+    std::vector<std::string> lines;
+    std::istringstream stream(text);
+    for (std::string line; std::getline(stream, line);)
+        lines.push_back(line);
+    return lines;
+}
+
+class DumpCommand : public RecordedSession {
+protected:
+    std::string written(const std::string& name, const std::string& bytes) const {
+        writeFile(folder / name, bytes);
+        return name;
+    }
+
+    ToolResult run(std::vector<std::string> arguments, ToolOptions options = {}) const {
+        options.folder = folder.path().string();
+        arguments.insert(arguments.begin(), "dump");
+        return runTool(arguments, options);
+    }
+
+    /// The entries of a stream file with these bytes, as NDJSON gives them.
+    std::vector<json> entriesOf(const std::string& bytes, int expectedCode = 0) const {
+        const ToolResult result = run({"--format", "ndjson", written("stream.dat", bytes)});
+        EXPECT_EQ(result.exitCode, expectedCode) << result.errors;
+        std::vector<json> entries;
+        for (const std::string& line : linesOf(result.output))
+            entries.push_back(json::parse(line));
+        return entries;
+    }
+};
+
+TEST_F(DumpCommand, PrintsEveryEntryInEveryFormat) {
+    copyOf(movie());
+    for (const std::string format : {"text", "json", "ndjson", "csv"}) {
+        const ToolResult result = run({"--format", format, "Recording.mp4"});
+        EXPECT_EQ(result.exitCode, 0);
+        EXPECT_EQ(result.errors, "");
+        expectGolden(result.output, "dump." + format);
+    }
+}
+
+TEST_F(DumpCommand, PrintsTextWithoutBeingAsked) {
+    written("a.dat", locations());
+    EXPECT_EQ(run({"a.dat"}).output, "    0.500000  x=10  y=-20\n    0.100000  x=0  y=7\n    2.000000  x=3  y=4\n");
+}
+
+TEST_F(DumpCommand, GivesTheSameEntriesAsOneDocumentAndLineByLine) {
+    const json document = json::parse(run({"--format", "json", movie()}).output);
+    std::size_t line = 0;
+    const auto lines = linesOf(run({"--format", "ndjson", movie()}).output);
+    for (const json& stream : document.at("files").at(0).at("streams"))
+        for (json entry : stream.at("entries")) {
+            entry["stream"] = stream.at("kind");
+            ASSERT_EQ(json::parse(lines.at(line++)), entry);
+        }
+    EXPECT_EQ(line, lines.size());
+}
+
+TEST_F(DumpCommand, PrintsOnlyTheStreamsThatAreNamed) {
+    const ToolResult result =
+        run({"--stream", "slideText", "--stream", "cpuUsage", "--stream", "slideText", "--format", "csv", movie()});
+    EXPECT_EQ(result.exitCode, 0);
+    const auto lines = linesOf(result.output);
+    EXPECT_EQ(lines.at(0), "stream,text,timestamp");
+    EXPECT_EQ(lines.at(4), "");
+    EXPECT_EQ(lines.at(5), "stream,cpuUsage,timestamp");
+    EXPECT_EQ(lines.size(), 5U + 41U);
+}
+
+TEST_F(DumpCommand, KnowsNearNamesOfStreams) {
+    const ToolResult result = run({"--stream", "cursorLocatoin", movie()});
+    EXPECT_EQ(result.exitCode, 2);
+    EXPECT_THAT(result.errors, HasSubstr("did you mean cursorLocation?"));
+    EXPECT_THAT(result.errors, HasSubstr("slideComment, recordingScaleFactor, systemData"));
+}
+
+TEST_F(DumpCommand, FailsForAStreamThatTheFileLacks) {
+    const ToolResult result = run({"--stream", "cpuUsage", written("a.dat", locations())});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("a.dat: has no stream cpuUsage; 'zulm info a.dat' lists what it has"));
+}
+
+TEST_F(DumpCommand, KeepsToARangeOfTimes) {
+    written("a.dat", locations());
+    EXPECT_EQ(linesOf(run({"--from", "0.5", "a.dat"}).output).size(), 2U);
+    EXPECT_EQ(run({"--from", "0.5", "--to", "1", "a.dat"}).output, "    0.500000  x=10  y=-20\n");
+    EXPECT_EQ(run({"--to", "-1", "a.dat"}).output, "");
+}
+
+TEST_F(DumpCommand, GivesTheExactTimeAndIts32BitFormWhereTheyDiffer) {
+    const auto entries = entriesOf(locations());
+    EXPECT_FALSE(entries.at(0).contains("timestamp_f32"));
+    EXPECT_EQ(entries.at(1).at("timestamp"), 0.1);
+    EXPECT_EQ(entries.at(1).at("timestamp_f32"), static_cast<double>(0.1F));
+}
+
+TEST_F(DumpCommand, SpellsTimesThatAreNoNumbers) {
+    const double infinity = std::numeric_limits<double>::infinity();
+    const auto entries =
+        entriesOf(streamHeader("2b7b6af2", 1, 16) + pointEntry(infinity, 1, 1) + pointEntry(-infinity, 1, 1) +
+                      pointEntry(std::nan(""), 1, 1) + pointEntry(1e300, 1, 1),
+                  3);
+    EXPECT_EQ(entries.at(0).at("timestamp"), "Infinity");
+    EXPECT_EQ(entries.at(1).at("timestamp"), "-Infinity");
+    EXPECT_EQ(entries.at(2).at("timestamp"), "NaN");
+    EXPECT_FALSE(entries.at(2).contains("timestamp_f32"));
+    EXPECT_EQ(entries.at(3).at("timestamp"), 1e300);
+    EXPECT_EQ(entries.at(3).at("timestamp_f32"), "Infinity");
+    EXPECT_EQ(linesOf(run({"stream.dat"}).output).at(1), "   -Infinity  x=1  y=1");
+}
+
+TEST_F(DumpCommand, KeepsTheBytesOfTextsThatAreNotUTF8) {
+    const auto entries = entriesOf(streamHeader("2b7b6a06", 1, 0) + textEntry(1, "Caf\xe9") +
+                                       textEntry(2, "Caf\xc3\xa9") + textEntry(3, std::string("a\0b", 3)),
+                                   3);
+    EXPECT_EQ(entries.at(0).at("name"), "Caf\xef\xbf\xbd");
+    EXPECT_EQ(entries.at(0).at("name_base64"), "Q2Fm6Q==");
+    EXPECT_EQ(entries.at(1).at("name"), "Caf\xc3\xa9");
+    EXPECT_FALSE(entries.at(1).contains("name_base64"));
+    EXPECT_EQ(entries.at(2).at("name"), "a"); // what a reader gets of it
+    EXPECT_EQ(entries.at(2).at("name_base64"), "YQBi");
+}
+
+TEST_F(DumpCommand, KeepsTheByteOfAKeyThatIsNoCharacter) {
+    const auto entries = entriesOf(streamHeader("2b7b6af5", 1, 16) + f64(1) + le32(200) + le32(0));
+    EXPECT_EQ(entries.at(0).at("characterString"), "\xef\xbf\xbd");
+    EXPECT_EQ(entries.at(0).at("characterString_base64"), "yA==");
+}
+
+TEST_F(DumpCommand, ShowsControlCharactersInsteadOfSendingThem) {
+    written("a.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "\x1b[2J\n\"q\"\xc2\x9b"));
+    EXPECT_EQ(run({"a.dat"}).output, "    1.000000  name=\"\\\\x1b[2J\\\\x0a\\\"q\\\"\\\\x9b\"\n");
+}
+
+TEST_F(DumpCommand, QuotesFieldsOfTables) {
+    written("a.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "a, \"b\"\nc"));
+    EXPECT_EQ(run({"--format", "csv", "a.dat"}).output,
+              "stream,name,timestamp\ntopmostAppName,\"a, \"\"b\"\"\nc\",1.0\n");
+}
+
+TEST_F(DumpCommand, ShowsListsWithTooFewAndTooManyTexts) {
+    const auto list = [](std::initializer_list<std::string> texts) {
+        std::string bytes;
+        for (const std::string& text : texts)
+            bytes += textEntry(0, text);
+        return le32(static_cast<std::uint32_t>(4 + bytes.size())) + le32(static_cast<std::uint32_t>(texts.size())) +
+               bytes;
+    };
+    const auto entries =
+        entriesOf(streamHeader("2b7b6afc", 1, 0) + list({"a", "b"}) + list({"1", "2", "3", "4", "5"}), 3);
+    EXPECT_EQ(entries.at(0).at("activeProcessorCount"), "b");
+    EXPECT_EQ(entries.at(0).at("osVersion"), nullptr);
+    EXPECT_THAT(entries.at(0).at("damage").get<std::string>(), HasSubstr("2 texts"));
+    EXPECT_EQ(entries.at(1).at("ram"), "4");
+    EXPECT_EQ(entries.at(1).at("further"), json::array({"5"}));
+}
+
+TEST_F(DumpCommand, WritesImagesAsTheyAreStored) {
+    const ToolResult result =
+        run({"--stream", "cursorImage", "--format", "ndjson", "--images", "cursors/drawn", movie()});
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    const json first = json::parse(linesOf(result.output).at(0));
+    const std::string file = first.at("image").at("file");
+    EXPECT_EQ(file, "cursors/drawn/cursor-11-entry-1.png");
+    const std::string bytes = contentsOf(folder / file);
+    EXPECT_EQ(bytes.size(), first.at("image").at("bytes").get<std::size_t>());
+    const auto image = Image::fromEncodedBytes({reinterpret_cast<const std::uint8_t*>(bytes.data()), bytes.size()});
+    ASSERT_TRUE(image);
+    EXPECT_EQ(image->width(), 32U);
+    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(folder / "cursors/drawn"), {}), 6);
+}
+
+TEST_F(DumpCommand, DoesNotReplaceImagesUnlessForced) {
+    const std::vector<std::string> arguments{"--stream", "cursorImage", "--images", ".", movie()};
+    EXPECT_EQ(run(arguments).exitCode, 0);
+    const ToolResult again = run(arguments);
+    EXPECT_EQ(again.exitCode, 1);
+    EXPECT_THAT(again.errors, HasSubstr("cursor-11-entry-1.png: exists already; --force replaces it"));
+    auto forced = arguments;
+    forced.emplace_back("--force");
+    EXPECT_EQ(run(forced).exitCode, 0);
+}
+
+TEST_F(DumpCommand, ReportsAnImageThatCannotBeDecoded) {
+    std::string stream = contentsOf(streamFile("cursorImage"));
+    const std::size_t header = stream.find("IHDR");
+    ASSERT_NE(header, std::string::npos);
+    stream[header + 4] = '\x7f'; // a width that the checksum denies
+    const auto entries = entriesOf(stream, 3);
+    EXPECT_THAT(entries.at(0).at("image").at("damage").get<std::string>(), HasSubstr("cannot be decoded"));
+    EXPECT_EQ(entries.at(1).at("image").at("width"), 32);
+    EXPECT_EQ(entries.at(6).at("image"), nullptr); // an image that came earlier
+    const ToolResult result = run({"--images", "images", "stream.dat"});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.errors, HasSubstr("cursorImage, entry 1: its image cannot be decoded; not written"));
+    EXPECT_FALSE(std::filesystem::exists(folder / "images/cursor-11-entry-1.png"));
+    EXPECT_TRUE(std::filesystem::exists(folder / "images/cursor-12-entry-2.png"));
+}
+
+TEST_F(DumpCommand, GivesWhatIsWholeOfAStreamThatIsCutShort) {
+    EXPECT_EQ(entriesOf(locations().substr(0, 60), 3).size(), 2U);
+    EXPECT_EQ(entriesOf(streamHeader("2b7b6a06", 1, 0) + textEntry(1, "whole") + textEntry(2, "torn").substr(0, 14), 3)
+                  .size(),
+              1U);
+}
+
+TEST_F(DumpCommand, DoesNotBelieveSizes) {
+    for (const std::uint32_t size : {0U, 4U, 7U, 0x7fffffffU, 0xffffffffU}) {
+        const auto entries =
+            entriesOf(streamHeader("2b7b6a06", 1, 0) + textEntry(1, "whole") + le32(size) + f64(2) + "text", 3);
+        EXPECT_EQ(entries.size(), 1U) << size;
+    }
+    EXPECT_TRUE(entriesOf(streamHeader("2b7b6afc", 1, 0) + le32(16) + le32(1) + le32(3) + f64(0), 3).empty());
+    EXPECT_LT(run({"stream.dat"}).peakMemoryKB, 400 << 10); // most of it a sanitizer's, where there is one
+}
+
+TEST_F(DumpCommand, SaysWhichStreamsItCannotDecode) {
+    const ToolResult result = run({"--format", "json", written("Odd.mp4", oddMovie())});
+    EXPECT_THAT(result.errors,
+                HasSubstr("entries of 2b7b6aff-7a1f-11e2-83d0-0017f200be7f, version 1, cannot be decoded"));
+    EXPECT_THAT(result.errors, HasSubstr("entries of caretPosition, version 1, cannot be decoded"));
+    const json streams = json::parse(result.output).at("files").at(0).at("streams");
+    ASSERT_EQ(streams.size(), 3U);
+    EXPECT_EQ(streams.at(0).at("kind"), "caretPosition");
+    EXPECT_EQ(streams.at(0).at("entries"), nullptr);
+    EXPECT_EQ(streams.at(1).at("entries").size(), 3U);
+    EXPECT_EQ(streams.at(2).at("kind"), nullptr);
+}
+
+TEST_F(DumpCommand, EndsWith4WhereThereIsNoMetaData) {
+    const ToolResult result = run({"--format", "json", written("plain.mp4", tinyMovie())});
+    EXPECT_EQ(result.exitCode, 4);
+    EXPECT_TRUE(json::parse(result.output).at("files").at(0).at("streams").empty());
+    EXPECT_THAT(result.errors, HasSubstr("plain.mp4: has no recording metadata"));
+}
+
+TEST_F(DumpCommand, ReadsStandardInput) {
+    ToolOptions options;
+    options.input = locations();
+    EXPECT_EQ(linesOf(run({"-"}, options).output).size(), 3U);
+}
+
+TEST_F(DumpCommand, NeedsNoMoreMemoryForMoreEntries) {
+    const auto memoryFor = [this](int count) {
+        std::string stream = streamHeader("2b7b6af2", 1, 16);
+        for (int i = 0; i < count; ++i)
+            stream += pointEntry(i, i, i);
+        ToolOptions options;
+        options.environment = {{"ASAN_OPTIONS", "quarantine_size_mb=1"}};
+        const ToolResult result = run({"--format", "json", written("many.dat", stream)}, options);
+        EXPECT_EQ(result.exitCode, 0);
+        EXPECT_EQ(linesOf(result.output).size(), static_cast<std::size_t>(count) + 3);
+        return result.peakMemoryKB;
+    };
+    const long few = memoryFor(1000);
+    EXPECT_LT(memoryFor(200000) - few, 4096);
+}
+
+} // namespace
+} // namespace ZULMetaData::Test

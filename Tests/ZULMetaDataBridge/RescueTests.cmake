@@ -1,0 +1,3 @@
+zulm_add_test(ZULMetaData/StreamEntriesTest)
+zulm_add_test(ZULMetaDataBridge/StreamRedactionTest)
+zulm_add_test(ZULMetaDataBridge/StreamSalvageTest)
