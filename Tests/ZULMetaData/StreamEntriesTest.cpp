@@ -91,24 +91,27 @@ TEST(StreamEntries, BelievesNoSizeBeyondTheEnd) {
 }
 
 TEST(StreamEntries, GoesByTheSizeThatAReaderKnows) {
-    StreamEntries entries = entriesOf(streamHeader(s_cursorLocations, 1, 12) + pointEntry(1, 2, 3) + pointEntry(4, 5, 6));
+    StreamEntries entries =
+        entriesOf(streamHeader(s_cursorLocations, 1, 12) + pointEntry(1, 2, 3) + pointEntry(4, 5, 6));
     entries.setEntrySize(16);
     EXPECT_EQ(allOf(entries), (std::vector{pointEntry(1, 2, 3), pointEntry(4, 5, 6)}));
 }
 
 TEST(StreamEntries, ReadsEntriesLargerThanItsPieces) {
     const std::string large(200000, 'x');
-    StreamEntries entries = entriesOf(streamHeader(s_appNames, 1, 0) + textEntry(1, "a") + textEntry(2, large) +
-                                      textEntry(3, "b"));
+    StreamEntries entries =
+        entriesOf(streamHeader(s_appNames, 1, 0) + textEntry(1, "a") + textEntry(2, large) + textEntry(3, "b"));
     EXPECT_EQ(allOf(entries), (std::vector{textEntry(1, "a"), textEntry(2, large), textEntry(3, "b")}));
 }
 
 TEST(StreamEntries, GivesFewerBytesWhereTheInputFails) {
     const std::string stream = appNameStream();
-    StreamEntries entries([&](std::uint64_t position, std::span<char> to) {
-        const std::string held = stream.substr(0, 45); // the length said more
-        return position < held.size() ? held.copy(to.data(), to.size(), static_cast<std::size_t>(position)) : 0;
-    }, stream.size());
+    StreamEntries entries(
+        [&](std::uint64_t position, std::span<char> to) {
+            const std::string held = stream.substr(0, 45); // the length said more
+            return position < held.size() ? held.copy(to.data(), to.size(), static_cast<std::size_t>(position)) : 0;
+        },
+        stream.size());
     entries.next();
     const auto second = entries.next();
     ASSERT_TRUE(second);

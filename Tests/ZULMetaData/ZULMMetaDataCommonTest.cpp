@@ -3,6 +3,7 @@
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 
 #include "Tests/Support/Bytes.h"
+#include "Tests/ZULMetaData/CursorImageSamples.h"
 #include "Tests/ZULMetaData/MemoryWatch.h"
 
 #include <gtest/gtest.h>
@@ -103,24 +104,6 @@ TEST(KeyStroke, PrintsItsFieldsUnsigned) {
 
 // ---- Cursor images --------------------------------------------------------------------------------------------
 
-constexpr CursorTypeID s_arrow{5};
-constexpr CursorImage::CursorImageFlags s_flags{1};
-
-unsigned char* newBytes(const std::string& bytes) {
-    auto* const block = static_cast<unsigned char*>(std::malloc(bytes.size()));
-    std::memcpy(block, bytes.data(), bytes.size());
-    return block;
-}
-
-CursorImage arrowWith(const std::string& bytes) {
-    return {7, 3, -2, newBytes(bytes), static_cast<std::uint32_t>(bytes.size()), s_arrow, s_flags};
-}
-
-/// A size that no bytes stand behind.
-CursorImage arrowWithoutItsBytes(std::uint32_t size) {
-    return {7, 3, -2, nullptr, size, s_arrow, s_flags};
-}
-
 std::string imageBytes(const CursorImage& image) {
     return image.imageData ? std::string(image.imageData, image.imageData + image.imageDataSize) : "no buffer";
 }
@@ -134,8 +117,8 @@ void expectArrow(const CursorImage& image) {
     EXPECT_EQ(image.uniqueId, 7U);
     EXPECT_EQ(image.hotspotOffsetX, 3);
     EXPECT_EQ(image.hotspotOffsetY, -2);
-    EXPECT_EQ(image.cursorTypeId, s_arrow);
-    EXPECT_EQ(image.flags, s_flags);
+    EXPECT_EQ(image.cursorTypeId, 5);
+    EXPECT_EQ(image.flags, 1U);
 }
 
 TEST(CursorImage, BeginsUnknownWithoutAnImage) {
@@ -150,9 +133,9 @@ TEST(CursorImage, BeginsUnknownWithoutAnImage) {
 
 TEST(CursorImage, AdoptsTheBytesItIsGivenAndFreesThem) {
     MemoryWatch memory;
-    unsigned char* const bytes = newBytes("PNG");
+    auto* const bytes = static_cast<unsigned char*>(std::malloc(3));
     {
-        const CursorImage image(7, 3, -2, bytes, 3, s_arrow, s_flags);
+        const CursorImage image(7, 3, -2, bytes, 3, CursorTypeID{5}, CursorImage::CursorImageFlags{1});
         expectArrow(image);
         EXPECT_EQ(image.imageData, bytes);
         EXPECT_EQ(image.imageDataSize, 3U);
@@ -166,7 +149,7 @@ TEST(CursorImage, IsFreedThroughItsVirtualDestructor) {
 }
 
 TEST(CursorImageCopy, HasBytesOfItsOwn) {
-    const CursorImage original = arrowWith("PNG");
+    const CursorImage original = arrow("PNG");
     const CursorImage copy(original);
     expectArrow(copy);
     EXPECT_EQ(imageBytes(copy), "PNG");
@@ -177,7 +160,7 @@ TEST(CursorImageCopy, HasBytesOfItsOwn) {
 TEST(CursorImageCopy, OutlivesItsOriginal) {
     CursorImage copy;
     {
-        const CursorImage original = arrowWith("PNG");
+        const CursorImage original = arrow("PNG");
         copy = original;
     }
     expectArrow(copy);
@@ -193,14 +176,14 @@ TEST(CursorImageCopy, LosesTheSizeThatNoBytesStandBehind) {
 }
 
 TEST(CursorImageCopy, LosesBytesWithoutASize) {
-    CursorImage original = arrowWith("PNG");
+    CursorImage original = arrow("PNG");
     original.imageDataSize = 0;
     const CursorImage copy(original);
     expectNoImage(copy);
 }
 
 TEST(CursorImageCopy, HasASizeButNoBytesWhereMemoryRanOut) {
-    const CursorImage original = arrowWith("PNG");
+    const CursorImage original = arrow("PNG");
     MemoryWatch memory;
     memory.refuseAbove(2);
     const CursorImage copy(original);
@@ -212,9 +195,9 @@ TEST(CursorImageCopy, HasASizeButNoBytesWhereMemoryRanOut) {
 TEST(CursorImageAssignment, FreesTheImageItReplaces) {
     MemoryWatch memory;
     {
-        CursorImage image = arrowWith("old image");
-        image = arrowWith("PNG");
-        const CursorImage original = arrowWith("PNG2");
+        CursorImage image = arrow("old image");
+        image = arrow("PNG");
+        const CursorImage original = arrow("PNG2");
         image = original;
         EXPECT_EQ(imageBytes(image), "PNG2");
         EXPECT_EQ(memory.blocks(), 2);
@@ -224,7 +207,7 @@ TEST(CursorImageAssignment, FreesTheImageItReplaces) {
 
 TEST(CursorImageAssignment, FreesTheImageEvenWhereItBringsNone) {
     MemoryWatch memory;
-    CursorImage image = arrowWith("old image");
+    CursorImage image = arrow("old image");
     const CursorImage original = arrowWithoutItsBytes(8);
     image = original;
     expectNoImage(image);
@@ -232,7 +215,7 @@ TEST(CursorImageAssignment, FreesTheImageEvenWhereItBringsNone) {
 }
 
 TEST(CursorImageAssignment, ReplacesEveryField) {
-    const CursorImage original = arrowWith("PNG");
+    const CursorImage original = arrow("PNG");
     CursorImage image(1, 1, 1, nullptr, 0, CursorTypeID{1}, CursorImage::CursorImageFlags{9});
     image = original;
     expectArrow(image);
@@ -241,7 +224,7 @@ TEST(CursorImageAssignment, ReplacesEveryField) {
 }
 
 TEST(CursorImageAssignment, ToItselfDoesNothing) {
-    CursorImage image = arrowWith("PNG");
+    CursorImage image = arrow("PNG");
     const unsigned char* const bytes = image.imageData;
     const CursorImage& same = image;
     image = same;
@@ -251,7 +234,7 @@ TEST(CursorImageAssignment, ToItselfDoesNothing) {
 }
 
 TEST(CursorImageMove, TakesTheBytesAlong) {
-    CursorImage original = arrowWith("PNG");
+    CursorImage original = arrow("PNG");
     const unsigned char* const bytes = original.imageData;
     const CursorImage moved(std::move(original));
     expectArrow(moved);
@@ -263,8 +246,8 @@ TEST(CursorImageMove, TakesTheBytesAlong) {
 TEST(CursorImageMove, FreesTheImageItReplaces) {
     MemoryWatch memory;
     {
-        CursorImage image = arrowWith("old image");
-        CursorImage original = arrowWith("PNG");
+        CursorImage image = arrow("old image");
+        CursorImage original = arrow("PNG");
         image = std::move(original);
         expectArrow(image);
         EXPECT_EQ(imageBytes(image), "PNG");
@@ -275,7 +258,7 @@ TEST(CursorImageMove, FreesTheImageItReplaces) {
 }
 
 TEST(CursorImageMove, ToItselfDoesNothing) {
-    CursorImage image = arrowWith("PNG");
+    CursorImage image = arrow("PNG");
     CursorImage& same = image;
     image = std::move(same);
     expectArrow(image);
@@ -284,7 +267,7 @@ TEST(CursorImageMove, ToItselfDoesNothing) {
 
 TEST(FreeImageData, FreesTheBytesOnRequest) {
     MemoryWatch memory;
-    CursorImage image = arrowWith("PNG");
+    CursorImage image = arrow("PNG");
     image.freeImageData(true);
     expectNoImage(image);
     expectArrow(image);
@@ -293,7 +276,7 @@ TEST(FreeImageData, FreesTheBytesOnRequest) {
 
 TEST(FreeImageData, LeavesTheBytesToTheCallerOtherwise) {
     MemoryWatch memory;
-    CursorImage image = arrowWith("PNG");
+    CursorImage image = arrow("PNG");
     unsigned char* const bytes = image.imageData;
     image.freeImageData(false);
     expectNoImage(image);
@@ -312,7 +295,7 @@ TEST(FreeImageData, DropsASizeThatNoBytesStandBehind) {
 
 TEST(FreeImageData, MayBeCalledAgain) {
     MemoryWatch memory;
-    CursorImage image = arrowWith("PNG");
+    CursorImage image = arrow("PNG");
     image.freeImageData(true);
     image.freeImageData(true);
     image.freeImageData(false);
@@ -321,24 +304,20 @@ TEST(FreeImageData, MayBeCalledAgain) {
 }
 
 TEST(CursorImageEquality, ComparesTheBytes) {
-    const CursorImage image = arrowWith("PNG");
-    EXPECT_TRUE(image == arrowWith("PNG"));
-    EXPECT_FALSE(image != arrowWith("PNG"));
-    EXPECT_FALSE(image == arrowWith("PNK"));
-    EXPECT_TRUE(image != arrowWith("PNK"));
-    EXPECT_FALSE(image == arrowWith("PNG2"));
+    const CursorImage image = arrow("PNG");
+    EXPECT_TRUE(image == arrow("PNG"));
+    EXPECT_FALSE(image != arrow("PNG"));
+    EXPECT_FALSE(image == arrow("PNK"));
+    EXPECT_TRUE(image != arrow("PNK"));
+    EXPECT_FALSE(image == arrow("PNG2"));
 }
 
 TEST(CursorImageEquality, ComparesEveryField) {
     const CursorImage image = arrowWithoutItsBytes(0);
     EXPECT_TRUE(image == arrowWithoutItsBytes(0));
     const CursorImage others[] = {
-        {8, 3, -2, nullptr, 0, s_arrow, s_flags},
-        {7, 4, -2, nullptr, 0, s_arrow, s_flags},
-        {7, 3, 2, nullptr, 0, s_arrow, s_flags},
-        {7, 3, -2, nullptr, 1, s_arrow, s_flags},
-        {7, 3, -2, nullptr, 0, CursorTypeUnknown, s_flags},
-        {7, 3, -2, nullptr, 0, s_arrow, CursorImage::DefaultFlags},
+        cursorImage(8, 3, -2, 5, 1),  cursorImage(7, 4, -2, 5, 1), cursorImage(7, 3, 2, 5, 1),
+        cursorImage(7, 3, -2, -1, 1), cursorImage(7, 3, -2, 5, 3), arrowWithoutItsBytes(1),
     };
     for (const CursorImage& other : others) {
         EXPECT_FALSE(image == other) << other;
@@ -353,7 +332,7 @@ TEST(CursorImageEquality, TellsIdentifiersApartInTheirUpperHalf) {
 }
 
 TEST(CursorImageEquality, LeavesBytesOutThatOneOfTheImagesLacks) {
-    const CursorImage image = arrowWith("PNG");
+    const CursorImage image = arrow("PNG");
     EXPECT_TRUE(image == arrowWithoutItsBytes(3));
     EXPECT_TRUE(arrowWithoutItsBytes(3) == image);
     EXPECT_TRUE(arrowWithoutItsBytes(3) == arrowWithoutItsBytes(3));
@@ -361,14 +340,14 @@ TEST(CursorImageEquality, LeavesBytesOutThatOneOfTheImagesLacks) {
 }
 
 TEST(CursorImageEquality, LeavesTheBytesOfASizeOfZeroOut) {
-    CursorImage image = arrowWith("PNG");
-    CursorImage other = arrowWith("ICO");
+    CursorImage image = arrow("PNG");
+    CursorImage other = arrow("ICO");
     image.imageDataSize = other.imageDataSize = 0;
     EXPECT_TRUE(image == other);
 }
 
 TEST(CursorImageEquality, HoldsForTheObjectItself) {
-    const CursorImage image = arrowWith("PNG");
+    const CursorImage image = arrow("PNG");
     const CursorImage& same = image;
     EXPECT_TRUE(image == same);
     EXPECT_FALSE(image != same);
@@ -376,13 +355,13 @@ TEST(CursorImageEquality, HoldsForTheObjectItself) {
 
 TEST(CursorImage, PrintsItsFields) {
     EXPECT_EQ(printed(CursorImage()), "(0,0,0,0,0,-1,3)");
-    EXPECT_EQ(printed(CursorImage(0xffffffffffffffff, s_lowest, s_highest, nullptr, 0xffffffff, s_arrow,
+    EXPECT_EQ(printed(CursorImage(0xffffffffffffffff, s_lowest, s_highest, nullptr, 0xffffffff, CursorTypeID{5},
                                   CursorImage::CursorImageFlags{0xfffffffe})),
               "(18446744073709551615,-2147483648,2147483647,4294967295,0,5,4294967294)");
 }
 
 TEST(CursorImage, PrintsTheAddressOfItsBytesAsANumber) {
-    const CursorImage image = arrowWith("PNG");
+    const CursorImage image = arrow("PNG");
     const auto address = reinterpret_cast<std::int64_t>(image.imageData);
     EXPECT_EQ(printed(image), "(7,3,-2,3," + std::to_string(address) + ",5,1)");
 }
@@ -461,9 +440,9 @@ TEST(UUIDText, HasFiveGroupsOfLowerCaseDigits) {
     EXPECT_EQ(printed(s_id), "2b7b6af1-7a1f-11e2-83d0-0017f200be7f");
     EXPECT_EQ(printed(uuid{}), "00000000-0000-0000-0000-000000000000");
     EXPECT_EQ(printed(withByte(15, 0x0a)), "00000000-0000-0000-0000-00000000000a");
-    EXPECT_EQ(printed(uuid{{0xff, 0xee, 0xdd, 0xcc, 0xbb, 0xaa, 0x99, 0x88, 0x77, 0x66, 0x55, 0x44, 0x33, 0x22, 0x11,
-                            0x0f}}),
-              "ffeeddcc-bbaa-9988-7766-55443322110f");
+    EXPECT_EQ(
+        printed(uuid{{0xff, 0xee, 0xdd, 0xcc, 0xbb, 0xaa, 0x99, 0x88, 0x77, 0x66, 0x55, 0x44, 0x33, 0x22, 0x11, 0x0f}}),
+        "ffeeddcc-bbaa-9988-7766-55443322110f");
 }
 
 TEST(UUIDText, LeavesTheStreamPrintingHexadecimalNumbersFilledWithZeros) {

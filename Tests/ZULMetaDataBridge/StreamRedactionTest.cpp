@@ -48,7 +48,8 @@ TEST(StreamRedaction, RemovesAKind) {
 TEST(StreamRedaction, ClearsKeysAndTheirModifiers) {
     Redaction redaction;
     redaction.clearsKeys = true;
-    const Redacted copy = redacted(keyStream(f64(1) + le32('a') + le32(0x20000) + f64(2) + le32(0) + le32(0)), redaction);
+    const Redacted copy =
+        redacted(keyStream(f64(1) + le32('a') + le32(0x20000) + f64(2) + le32(0) + le32(0)), redaction);
     EXPECT_EQ(copy.bytes, keyStream(f64(1) + le32(0) + le32(0) + f64(2) + le32(0) + le32(0)));
     EXPECT_EQ(copy.result.entriesChanged, 1U);
     EXPECT_EQ(copy.result.entries, 2U);

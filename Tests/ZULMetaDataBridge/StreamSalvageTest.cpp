@@ -12,7 +12,8 @@ namespace {
 
 using Origin = SalvagedStream::Origin;
 
-std::vector<SalvagedStream> salvaged(const std::string& bytes, MetaDataParser::StreamType type = MetaDataParser::QuickTime) {
+std::vector<SalvagedStream> salvaged(const std::string& bytes,
+                                     MetaDataParser::StreamType type = MetaDataParser::QuickTime) {
     std::istringstream file(bytes);
     return StreamSalvage(file, type).run().streams;
 }
@@ -124,7 +125,8 @@ TEST(StreamSalvage, FindsStreamsOfARIFFFileThatWasCut) {
 }
 
 TEST(StreamSalvage, ReachesStreamsOfAWholeRIFFFile) {
-    for (const SalvagedStream& stream : salvaged(riffMedia() + zulmChunk({locationStream(), appNameStream()}), MetaDataParser::Riff))
+    for (const SalvagedStream& stream :
+         salvaged(riffMedia() + zulmChunk({locationStream(), appNameStream()}), MetaDataParser::Riff))
         EXPECT_EQ(stream.origin, Origin::Reachable);
 }
 
@@ -146,17 +148,17 @@ TEST(StreamSalvage, KeepsReachableStreamsOfUnknownKinds) {
 TEST(StreamSalvage, IsNotTakenInByMediaThatLookLikeAHeader) {
     const std::string entry = pointEntry(1, 2, 3);
     for (const std::string& payload : {
-             hex("2b7b6af2 7a1f 11e2 83d0 0017f200be7f"),                        // an identifier alone
-             streamHeader("2b7b6af4", 1, 16) + entry,                            // of nobody
-             streamHeader(s_cursorLocations, 0, 16) + entry,                     // of no version
-             streamHeader(s_cursorLocations, 2, 16) + entry,                     // of a version to come
-             streamHeader(s_cursorLocations, 1, 24) + entry + entry,             // with entries of another kind
-             streamHeader(s_cursorLocations, 1, 16),                             // without an entry
-             streamHeader(s_cursorLocations, 1, 16) + entry.substr(0, 15),       // with a part of one
-             streamHeader(s_cursorLocations, 1, 16) + pointEntry(-1e300, 2, 3),  // at no time
-             streamHeader(s_cursorLocations, 1, 16) + std::string(16, '\xff'),   // at no number
-             streamHeader(s_appNames, 1, 0) + le32(4) + "four",                  // without room for a time
-             streamHeader("2b7b6a00", 1, 20) + std::string(20, '\0'),            // of no value's size
+             hex("2b7b6af2 7a1f 11e2 83d0 0017f200be7f"),                       // an identifier alone
+             streamHeader("2b7b6af4", 1, 16) + entry,                           // of nobody
+             streamHeader(s_cursorLocations, 0, 16) + entry,                    // of no version
+             streamHeader(s_cursorLocations, 2, 16) + entry,                    // of a version to come
+             streamHeader(s_cursorLocations, 1, 24) + entry + entry,            // with entries of another kind
+             streamHeader(s_cursorLocations, 1, 16),                            // without an entry
+             streamHeader(s_cursorLocations, 1, 16) + entry.substr(0, 15),      // with a part of one
+             streamHeader(s_cursorLocations, 1, 16) + pointEntry(-1e300, 2, 3), // at no time
+             streamHeader(s_cursorLocations, 1, 16) + std::string(16, '\xff'),  // at no number
+             streamHeader(s_appNames, 1, 0) + le32(4) + "four",                 // without room for a time
+             streamHeader("2b7b6a00", 1, 20) + std::string(20, '\0'),           // of no value's size
          }) {
         const std::string file = atom("ftyp", "mp42") + atom("mdat", payload);
         EXPECT_TRUE(salvaged(file, MetaDataParser::Unknown).empty()) << testing::PrintToString(payload);
@@ -225,7 +227,8 @@ TEST(StreamSalvage, StopsCountingInAFileFullOfHeaders) {
 TEST(StreamSalvage, SurvivesEveryHostileSize) {
     for (const std::uint64_t size : s_hostileSizes) {
         const std::string data = be32(1) + "DATA" + be64(size) + locationStream();
-        for (const std::string& file : {media() + extendedAtom("ZULM", data), media() + be32(1) + "ZULM" + be64(size) + data}) {
+        for (const std::string& file :
+             {media() + extendedAtom("ZULM", data), media() + be32(1) + "ZULM" + be64(size) + data}) {
             const auto streams = salvaged(file);
             ASSERT_EQ(streams.size(), 1U) << size;
             EXPECT_LE(streams[0].end(), file.size());

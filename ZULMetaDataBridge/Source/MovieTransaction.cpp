@@ -2,7 +2,6 @@
 
 #include "ZULMetaData/AtomFormat.h"
 
-
 namespace ZULMetaData {
 
 MovieTransaction::MovieTransaction(const FileLocation& movie) : file_(movie), oldSize_(file_.size()), end_(oldSize_) {}

@@ -1,0 +1,112 @@
+#include "Tests/Tools/RecordedSession.h"
+#include "Tests/Tools/ToolRun.h"
+#include "Tests/ZULMetaData/ContainerBytes.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
+
+namespace ZULMetaData::Test {
+namespace {
+
+using Json = nlohmann::json;
+using testing::HasSubstr;
+
+class GrepCommand : public RecordedSession {
+protected:
+    std::string write(const std::string& name, const std::string& contents) const {
+        writeFile(folder / name, contents);
+        return folder / name;
+    }
+
+    /// "Abc" at 0.5 and "Notes" at 2 seconds.
+    std::string names() const { return write("names.mp4", media() + zulmAtom({appNameStream()})); }
+
+    std::string named(const std::string& text) const {
+        return write("text.dat", streamHeader(s_appNames, 1, 0) + textEntry(1, text));
+    }
+};
+
+TEST_F(GrepCommand, ShowsFileKindTimeAndText) {
+    const ToolResult result = runTool({"grep", "^N.t", names()});
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_EQ(result.output, names() + ":topmostAppName:2.000000: Notes\n");
+}
+
+TEST_F(GrepCommand, EndsWithFourWhereNothingMatches) {
+    const ToolResult result = runTool({"grep", "budget", names()});
+    EXPECT_EQ(result.exitCode, 4);
+    EXPECT_EQ(result.output, "");
+    EXPECT_EQ(runTool({"grep", "x", write("none.mp4", media())}).exitCode, 4);
+}
+
+TEST_F(GrepCommand, IgnoresCaseAndTakesFixedTextsWhereAsked) {
+    EXPECT_EQ(runTool({"grep", "notes", names()}).exitCode, 4);
+    EXPECT_EQ(runTool({"grep", "-i", "notes", names()}).exitCode, 0);
+    const std::string file = named("a.c (1)");
+    EXPECT_EQ(runTool({"grep", "-F", "a.c (", file}).exitCode, 0);
+    EXPECT_EQ(runTool({"grep", "-F", "a?c", file}).exitCode, 4);
+    EXPECT_EQ(runTool({"grep", "-i", "-F", "A.C", file}).exitCode, 0);
+}
+
+TEST_F(GrepCommand, SearchesEveryKindOfTextInARecording) {
+    const std::string output = runTool({"grep", ".", movie()}).output;
+    for (const char* kind : {"slideTitles", "slideText", "slideComment", "topmostAppName", "topmostWindowTitle"})
+        EXPECT_THAT(output, HasSubstr(std::string(":") + kind + ":"));
+    EXPECT_THAT(output, testing::Not(HasSubstr("systemData")));
+}
+
+TEST_F(GrepCommand, SearchesOnlyTheChosenKinds) {
+    EXPECT_THAT(runTool({"grep", ".", movie(), "--stream", "slideText"}).output,
+                testing::Not(HasSubstr("slideTitles")));
+}
+
+TEST_F(GrepCommand, SearchesOnBehindAFileThatCannotBeRead) {
+    const ToolResult result = runTool({"grep", "Notes", folder / "missing.mp4", names()});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("missing.mp4: no such file"));
+    EXPECT_THAT(result.output, HasSubstr("Notes"));
+}
+
+TEST_F(GrepCommand, FindsInOneOfSeveralFiles) {
+    const std::string none = write("none.mp4", media());
+    EXPECT_EQ(runTool({"grep", "Notes", none, names()}).exitCode, 0);
+    EXPECT_EQ(runTool({"grep", "Notes", names(), none}).exitCode, 0);
+}
+
+TEST_F(GrepCommand, SaysWhatCouldNotBeSearched) {
+    const std::string file = write("torn.dat", appNameStream() + le32(100) + f64(3) + "Notes");
+    const ToolResult result = runTool({"grep", "Notes", file});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.output, HasSubstr(":2.000000: Notes"));
+    EXPECT_THAT(result.errors, HasSubstr("cannot be searched from offset 56 on; 'zulm verify"));
+}
+
+TEST_F(GrepCommand, ShowsTextsThatAreNotUTF8OrWouldMoveTheTerminal) {
+    const ToolResult result = runTool({"grep", "Not", named("Not\xff\x1b[2Jes")});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_THAT(result.output, HasSubstr("Not\xef\xbf\xbd\\x1b[2Jes"));
+}
+
+TEST_F(GrepCommand, TakesNoLongerForAnExpressionMeantToHang) {
+    EXPECT_EQ(runTool({"grep", "(a*)*(a*)*(a*)*b$", named(std::string(100000, 'a'))}).exitCode, 4);
+    EXPECT_EQ(runTool({"grep", "((((x{100}){100}){100}){100})", names()}).exitCode, 2);
+}
+
+TEST_F(GrepCommand, RefusesWhatIsNoExpression) {
+    const ToolResult result = runTool({"grep", "(", names()});
+    EXPECT_EQ(result.exitCode, 2);
+    EXPECT_THAT(result.errors, HasSubstr("( is no regular expression: missing )"));
+    EXPECT_EQ(runTool({"grep", "-F", "(", names()}).exitCode, 4);
+}
+
+TEST_F(GrepCommand, ReportsAsJSON) {
+    const Json report = Json::parse(runTool({"grep", "o", names(), "--json"}).output);
+    EXPECT_EQ(report["schema"], "zulm.grep");
+    EXPECT_EQ(report["files"][0]["path"], names());
+    EXPECT_EQ(report["files"][0]["matches"],
+              Json::parse(R"([{"stream": "topmostAppName", "timestamp": 2.0, "text": "Notes"}])"));
+}
+
+} // namespace
+} // namespace ZULMetaData::Test

@@ -1,0 +1,218 @@
+#include "Tests/Tools/RecordedSession.h"
+#include "Tests/Tools/ToolRun.h"
+#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "ZULMetaDataBridge/ZULMetaDataBridge.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
+
+namespace ZULMetaData::Test {
+namespace {
+
+using Json = nlohmann::json;
+using testing::HasSubstr;
+using testing::Not;
+
+const std::string s_ellipsis = "\xe2\x80\xa6";
+
+class RedactCommand : public RecordedSession {
+protected:
+    std::string write(const std::string& name, const std::string& contents) const {
+        writeFile(folder / name, contents);
+        return folder / name;
+    }
+
+    /// The copy's bytes, after `verify` found nothing wrong with it.
+    std::string redacted(const std::string& file, std::vector<std::string> arguments) const {
+        const std::string output = folder / ("out" + std::filesystem::path(file).extension().string());
+        arguments.insert(arguments.begin(), {"redact", file, "-o", output, "--force"});
+        const ToolResult result = runTool(arguments);
+        EXPECT_EQ(result.exitCode, 0) << result.errors;
+        const ToolResult verified = runTool({"verify", output});
+        EXPECT_EQ(verified.exitCode, 0) << verified.output << verified.errors;
+        return contentsOf(output);
+    }
+};
+
+std::string keyStream() {
+    return streamHeader("2b7b6af5", 1, 16) + f64(1) + le32(0x5ec3e700) + le32(0x20000) + f64(2) + le32(0x5ec3e701) +
+           le32(0);
+}
+
+std::string clearedKeyStream() {
+    const std::string cleared = le32(0) + le32(0);
+    return streamHeader("2b7b6af5", 1, 16) + f64(1) + cleared + f64(2) + cleared;
+}
+
+std::string hiddenNames() {
+    return streamHeader(s_appNames, 1, 0) + textEntry(0.5, "Abc") + textEntry(2.0, s_ellipsis);
+}
+
+TEST_F(RedactCommand, ClearsKeysInAMovie) {
+    const std::string file = write("movie.mp4", media() + zulmAtom({keyStream(), locationStream()}));
+    const std::string copy = redacted(file, {"--keys"});
+    EXPECT_EQ(copy, media() + zulmAtom({locationStream(), clearedKeyStream()})) << "in the order of the identifiers";
+    EXPECT_THAT(copy, Not(HasSubstr(le32(0x5ec3e700).substr(0, 4))));
+}
+
+TEST_F(RedactCommand, HidesTitlesInEveryContainer) {
+    EXPECT_EQ(redacted(write("a.mov", media() + zulmAtom({appNameStream()})), {"--titles", "Not"}),
+              media() + zulmAtom({hiddenNames()}));
+    EXPECT_EQ(redacted(write("a.wav", riffMedia() + zulmChunk({appNameStream()})), {"--titles", "Not"}),
+              riffMedia() + zulmChunk({hiddenNames()}));
+    EXPECT_EQ(redacted(write("a.dat", appNameStream()), {"--titles", "(?i)nOT"}), hiddenNames());
+}
+
+TEST_F(RedactCommand, LeavesNothingOfTheHiddenTextsInARecording) {
+    const Json texts = Json::parse(runTool({"grep", ".", movie(), "--json"}).output)["files"][0]["matches"];
+    ASSERT_FALSE(texts.empty());
+    const std::string copy = redacted(movie(), {"--titles", ".", "--keys", "--streams", "systemData"});
+    for (const Json& match : texts)
+        EXPECT_THAT(copy, Not(HasSubstr(match["text"].get<std::string>())));
+    EXPECT_THAT(copy, Not(HasSubstr("ProcessorCount")));
+    EXPECT_THAT(copy, HasSubstr("ZULR"));
+    EXPECT_THAT(copy, HasSubstr("pictures and sound"));
+    EXPECT_EQ(runTool({"convert", folder / "out.mp4", "--to", "srt", "--show-keys"}).output.find("[returnKey]"),
+              std::string::npos);
+}
+
+TEST_F(RedactCommand, ChangesNothingElse) {
+    redacted(movie(), {"--streams", "systemData"});
+    const ToolResult result = runTool({"diff", movie(), folder / "out.mp4"});
+    EXPECT_EQ(result.output, "systemData: only in " + movie() + "\n");
+}
+
+TEST_F(RedactCommand, RemovesStreamsAndTimes) {
+    const std::string file = write("movie.mp4", media() + zulmAtom({locationStream(), appNameStream()}));
+    EXPECT_EQ(redacted(file, {"--streams", "topmostAppName"}), media() + zulmAtom({locationStream()}));
+    const std::string late = streamHeader(s_cursorLocations, 1, 16) + pointEntry(1.0, -3, 7);
+    const std::string lateNames = streamHeader(s_appNames, 1, 0) + textEntry(2.0, "Notes");
+    EXPECT_EQ(redacted(file, {"--range", ":0.75"}), media() + zulmAtom({lateNames, late}));
+    EXPECT_EQ(redacted(file, {"--range", "0.5:0.5"}), media() + zulmAtom({lateNames, late}));
+    const std::string early = streamHeader(s_cursorLocations, 1, 16) + pointEntry(0.5, 10, 20);
+    const std::string earlyNames = streamHeader(s_appNames, 1, 0) + textEntry(0.5, "Abc");
+    EXPECT_EQ(redacted(file, {"--range", "0.75:"}), media() + zulmAtom({earlyNames, early}));
+}
+
+TEST_F(RedactCommand, LeavesNoMetadataWhereAllOfItGoes) {
+    const std::string file = write("movie.mp4", media() + zulmAtom({appNameStream()}));
+    const ToolResult result = runTool({"redact", file, "-o", folder / "out.mp4", "--streams", "topmostAppName"});
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_EQ(contentsOf(folder / "out.mp4"), media());
+    const std::string stream = write("a.dat", appNameStream());
+    EXPECT_EQ(runTool({"redact", stream, "-o", folder / "b.dat", "--streams", "topmostAppName"}).exitCode, 1);
+    EXPECT_FALSE(std::filesystem::exists(folder / "b.dat"));
+}
+
+TEST_F(RedactCommand, KeepsTheMediaInItsPlace) {
+    const std::string before = zulmAtom({appNameStream()});
+    const std::string file = write("movie.mp4", before + media() + before);
+    const std::string copy = redacted(file, {"--titles", "Not"});
+    EXPECT_EQ(copy, atom("free", std::string(before.size() - 8, '\0')) + media() + zulmAtom({hiddenNames()}));
+    const std::string old = zulmChunk({appNameStream()});
+    const std::string sound = write("sound.avi", riffMedia() + old + ZULMetaData::Test::chunk("IDXX", "odd"));
+    EXPECT_EQ(redacted(sound, {"--titles", "Not"}), riffMedia() +
+                                                        ZULMetaData::Test::chunk("JUNK", std::string(old.size() - 8, '\0')) +
+                                                        ZULMetaData::Test::chunk("IDXX", "odd") + zulmChunk({hiddenNames()}));
+}
+
+TEST_F(RedactCommand, PadsOddChunks) {
+    const std::string odd = streamHeader(s_appNames, 1, 0) + textEntry(1, "a");
+    const std::string file = write("sound.wav", chunk("RIFF", "odd") + zulmChunk({odd, odd + textEntry(2, "bc")}));
+    EXPECT_EQ(redacted(file, {"--keys"}), chunk("RIFF", "odd") + zulmChunk({odd + textEntry(2, "bc")}));
+}
+
+TEST_F(RedactCommand, KeepsRecordingInfo) {
+    const std::string info = extendedAtom("ZULR", std::string(64, '\x01'));
+    const std::string file = write("movie.mp4", media() + zulmAtom({appNameStream()}) + info);
+    EXPECT_EQ(redacted(file, {"--titles", "Not"}), media() + info + zulmAtom({hiddenNames()}));
+}
+
+TEST_F(RedactCommand, DropsATornTailAndSaysSo) {
+    const std::string file = write("torn.dat", appNameStream() + "secret tail");
+    const ToolResult result = runTool({"redact", file, "-o", folder / "out.dat", "--keys"});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.errors, HasSubstr("topmostAppName: left out 11 bytes behind its last whole entry"));
+    EXPECT_EQ(contentsOf(folder / "out.dat"), appNameStream());
+    EXPECT_EQ(runTool({"verify", folder / "out.dat"}).exitCode, 0);
+}
+
+TEST_F(RedactCommand, DropsStreamsThatReadersDoNotFind) {
+    const std::string torn = be32(1) + "DATA" + be64(16 + 56 + 5) + locationStream();
+    const std::string file =
+        write("torn.mp4", media() + extendedAtom("ZULM", torn + extendedAtom("DATA", appNameStream())));
+    const ToolResult result = runTool({"redact", file, "-o", folder / "out.mp4", "--keys"});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.errors, HasSubstr("left out 1 streams that readers do not find; 'zulm salvage"));
+    EXPECT_EQ(contentsOf(folder / "out.mp4"), media() + zulmAtom({locationStream()}));
+}
+
+TEST_F(RedactCommand, RemovesUnknownStreamsThatItCannotLookInto) {
+    const std::string unknown = streamHeader("deadbeef", 1, 12) + f64(1) + raw(2);
+    const std::string file = write("movie.mp4", media() + zulmAtom({appNameStream(), unknown}));
+    const ToolResult result = runTool({"redact", file, "-o", folder / "out.mp4", "--titles", "Not"});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.errors, HasSubstr("removed: its entries cannot be looked into"));
+    EXPECT_EQ(contentsOf(folder / "out.mp4"), media() + zulmAtom({hiddenNames()}));
+}
+
+TEST_F(RedactCommand, RefusesMetadataThatWouldStayOutsideOfItsPlace) {
+    const std::string file = write("movie.mp4", atom("mdat", "xx" + appNameStream()) + zulmAtom({locationStream()}));
+    const ToolResult result = runTool({"redact", file, "-o", folder / "out.mp4", "--titles", "Not"});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("topmostAppName at offset 10 is outside of the metadata"));
+    EXPECT_FALSE(std::filesystem::exists(folder / "out.mp4"));
+}
+
+TEST_F(RedactCommand, RefusesADamagedContainer) {
+    const std::string open = media() + zulmAtom({appNameStream()}) + be32(0) + "mdat" + "rest";
+    const ToolResult result = runTool({"redact", write("open.mp4", open), "-o", folder / "out.mp4", "--keys"});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("'zulm repair"));
+    const std::string cut = write("cut.wav", riffMedia() + zulmChunk({appNameStream()}) + "RIFF" + le32(99));
+    EXPECT_EQ(runTool({"redact", cut, "-o", folder / "out.wav", "--keys"}).exitCode, 1);
+    EXPECT_FALSE(std::filesystem::exists(folder / "out.mp4"));
+    EXPECT_FALSE(std::filesystem::exists(folder / "out.wav"));
+}
+
+TEST_F(RedactCommand, KeepsTheHolesOfALargeMovie) {
+    const std::uint64_t size = 5ULL << 30;
+    const std::string file = folder / "large.mp4";
+    writeSparseFile(file, size, atom("ftyp", "mp42") + be32(1) + "mdat" + be64(size - 12));
+    writeFile(folder / "names.dat", appNameStream());
+    ZULMAtomWriter().writeMetaDataFiles({folder / "names.dat"}, file);
+    const ToolResult result = runTool({"redact", file, "-o", folder / "out.mp4", "--titles", "Not"});
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_EQ(std::filesystem::file_size(folder / "out.mp4"), size + zulmAtom({hiddenNames()}).size());
+    EXPECT_EQ(runTool({"extract", folder / "out.mp4", "-o", folder / "out"}).exitCode, 0);
+    EXPECT_EQ(contentsOf(folder / "out/topmostAppName.dat"), hiddenNames());
+    EXPECT_LT(std::stoull(outputOf("du -k " + (folder / "out.mp4"))), 10000U) << "kilobytes on the disk";
+}
+
+TEST_F(RedactCommand, RefusesWhatItCannotMean) {
+    const std::string output = folder / "out.mp4";
+    EXPECT_EQ(runTool({"redact", movie(), "-o", output}).exitCode, 2);
+    for (const char* range : {"5", ":", "a:b", "5:4", "nan:1", "1:2:3", "1x:2"})
+        EXPECT_EQ(runTool({"redact", movie(), "-o", output, "--range", range}).exitCode, 2) << range;
+    EXPECT_EQ(runTool({"redact", movie(), "-o", output, "--titles", "("}).exitCode, 2);
+    EXPECT_EQ(runTool({"redact", movie(), "-o", output, "--streams", "nonsense"}).exitCode, 2);
+    EXPECT_EQ(runTool({"redact", movie(), "-o", folder / "out.wav", "--keys"}).exitCode, 1);
+    EXPECT_EQ(runTool({"redact", movie(), "-o", movie(), "--force", "--keys"}).exitCode, 1);
+    EXPECT_EQ(runTool({"redact", write("none.mp4", media()), "-o", output, "--keys"}).exitCode, 4);
+    EXPECT_FALSE(std::filesystem::exists(output));
+    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(folder.path()), {}), 1) << "nothing is left behind";
+}
+
+TEST_F(RedactCommand, ReportsAsJSON) {
+    const std::string file = write("movie.mp4", media() + zulmAtom({keyStream(), appNameStream()}));
+    const ToolResult result =
+        runTool({"redact", file, "-o", folder / "out.mp4", "--keys", "--streams", "topmostAppName", "--json"});
+    const Json streams = Json::parse(result.output)["files"][0]["streams"];
+    EXPECT_EQ(streams[0]["kind"], "topmostAppName");
+    EXPECT_EQ(streams[0]["removed"], true);
+    EXPECT_EQ(streams[1]["entries_changed"], 2);
+}
+
+} // namespace
+} // namespace ZULMetaData::Test
