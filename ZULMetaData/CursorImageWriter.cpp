@@ -1,6 +1,7 @@
 #include "ZULMetaData/CursorImageWriter.h"
 
 #include "ZULMetaData/InvalidEntry.h"
+#include "ZULMetaData/StreamBufferAccess.h"
 
 #include <istream>
 #include <ostream>
@@ -9,7 +10,7 @@ namespace ZULMetaData {
 
 void CursorImageWriter::Write(std::ostream& stream, const FieldInfo& field) {
     if (field.data)
-        stream.write(reinterpret_cast<const char*>(field.data), field.size);
+        detail::writeBytes(stream, reinterpret_cast<const char*>(field.data), field.size);
     else // memory for an image without bytes ran out: it would have been zeros
         for (std::uint32_t written = 0; written < field.size; ++written)
             stream.put('\0');

@@ -1,12 +1,13 @@
 #include "ZULMetaData/AtomFormat.h"
 #include "ZULMetaData/AtomWriting.h"
 #include "ZULMetaData/PositionedInput.h"
+#include "ZULMetaData/StreamBufferAccess.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <algorithm>
-#include <array>
 #include <fstream>
 #include <iostream>
+#include <memory>
 #include <sstream>
 #include <stdexcept>
 
@@ -15,6 +16,7 @@ namespace ZULMetaData {
 namespace {
 
 constexpr std::size_t s_copySize = 2048;
+constexpr std::size_t s_streamBufferSize = 64 * 1024;
 
 /// The end of the last whole entry, of entries that begin with their size. Where not even the first is whole, all
 /// of it counts, unless its size itself is torn.
@@ -47,12 +49,15 @@ std::uint64_t endOfWholeEntries(std::istream& stream, std::uint64_t total) {
     return sizeof header + entries * header.fixedEntrySize;
 }
 
+/// Straight from the one's get area into the other's put area.
 void copyBytes(std::istream& from, std::ostream& to, std::uint64_t count) {
-    std::array<char, s_copySize> piece;
-    while (count > 0 && from.good()) {
-        from.read(piece.data(), static_cast<std::streamsize>(std::min<std::uint64_t>(count, piece.size())));
-        to.write(piece.data(), from.gcount());
-        count -= static_cast<std::uint64_t>(from.gcount());
+    std::streambuf& buffer = *from.rdbuf();
+    while (count > 0 && from.peek() != std::istream::traits_type::eof()) {
+        const std::size_t available = detail::StreamBufferAccess::available(buffer);
+        const auto size = static_cast<std::size_t>(std::min<std::uint64_t>(count, std::min(available, s_copySize)));
+        detail::writeBytes(to, detail::StreamBufferAccess::getPosition(buffer), size);
+        detail::StreamBufferAccess::advanceGet(buffer, size);
+        count -= size;
     }
 }
 
@@ -70,7 +75,9 @@ void writeStream(std::ostream& movie, std::istream& stream) {
 }
 
 bool writeStreamFile(std::ostream& movie, const std::string& moviePath, const std::string& path) {
+    const std::unique_ptr<char[]> buffer(new char[s_streamBufferSize]); // outlives the stream that reads into it
     std::ifstream file;
+    file.rdbuf()->pubsetbuf(buffer.get(), s_streamBufferSize);
     fileOpen(file, path.c_str(), std::ios_base::in | std::ios_base::binary);
     if (!file.is_open() || !file.good()) {
         std::cout << "Couldn't open meta data file: " << moviePath << '\n'; // names the movie, not the file
@@ -87,16 +94,27 @@ void finishAtom(std::ofstream& movie, const detail::OpenAtom& atom, const std::s
     detail::writeAtomSize(patch, atom.sizeField, size);
 }
 
-std::ofstream openForAppending(const std::string& path) {
-    std::ofstream movie;
-    fileOpen(movie, path.c_str(), std::ios_base::app | std::ios_base::binary | std::ios_base::out);
-    return movie;
-}
+/// A movie opened for appending, with a large buffer.
+class AppendedMovie {
+public:
+    explicit AppendedMovie(const std::string& path) {
+        stream_.rdbuf()->pubsetbuf(buffer_.get(), s_bufferSize);
+        fileOpen(stream_, path.c_str(), std::ios_base::app | std::ios_base::binary | std::ios_base::out);
+    }
+    std::ofstream& stream() { return stream_; }
+
+private:
+    static constexpr std::size_t s_bufferSize = 128 * 1024;
+
+    std::unique_ptr<char[]> buffer_{new char[s_bufferSize]}; // outlives the stream that writes out of it
+    std::ofstream stream_;
+};
 
 } // namespace
 
 bool MP4MetaData::appendMetaDataFiles(const std::string& path, const std::vector<std::string>& files) {
-    std::ofstream movie = openForAppending(path);
+    AppendedMovie appended(path);
+    std::ofstream& movie = appended.stream();
     if (!movie.is_open() || !movie.good()) {
         std::cout << "Couldn't open output file for appending meta data: " << path << std::endl;
         return false;
@@ -110,7 +128,8 @@ bool MP4MetaData::appendMetaDataFiles(const std::string& path, const std::vector
 }
 
 void MP4MetaData::appendMetaData(const std::string& path, const std::map<uuid, std::string>& streams) {
-    std::ofstream movie = openForAppending(path);
+    AppendedMovie appended(path);
+    std::ofstream& movie = appended.stream();
     const detail::OpenAtom atom = detail::beginAtom(movie, detail::s_metaDataAtom);
     for (const auto& [type, bytes] : streams) {
         std::stringstream stream(bytes);

@@ -33,7 +33,7 @@ void PositionedInput::catchUp() {
     streamPosition_ = position_;
 }
 
-bool PositionedInput::read(void* bytes, std::size_t size) {
+bool PositionedInput::readStream(void* bytes, std::size_t size) {
     if (!enoughBytesLeft(size))
         return false;
     catchUp();

@@ -2,8 +2,11 @@
 
 // An input stream whose position is counted instead of asked for, bounded by the size of its file.
 
+#include "ZULMetaData/StreamBufferAccess.h"
+
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <istream>
 
 namespace ZULMetaData::detail {
@@ -23,7 +26,7 @@ public:
     bool moveTo(std::uint64_t target);
 
     /// Reads exactly `size` bytes. False where they reach beyond the total or fail to come.
-    bool read(void* bytes, std::size_t size);
+    bool read(void* bytes, std::size_t size) { return readBuffered(bytes, size) || readStream(bytes, size); }
 
     bool readBigEndian(std::uint32_t& value);
     bool readBigEndian(std::uint64_t& value);
@@ -38,6 +41,8 @@ public:
     bool readChunkTypeAndSize(std::uint32_t& type, std::uint32_t& size);
 
 private:
+    bool readBuffered(void* bytes, std::size_t size);
+    bool readStream(void* bytes, std::size_t size);
     void catchUp();
 
     std::istream& stream_;
@@ -45,5 +50,19 @@ private:
     std::uint64_t position_;
     std::uint64_t total_;
 };
+
+/// Out of the stream's get area, where all that is passed over and wanted lies in it. A walk over small entries
+/// comes this way almost every time.
+inline bool PositionedInput::readBuffered(void* bytes, std::size_t size) {
+    std::streambuf& buffer = *stream_.rdbuf();
+    const std::uint64_t distance = position_ - streamPosition_; // huge where the way leads back
+    const std::size_t available = StreamBufferAccess::available(buffer);
+    if (distance > available || size > available - distance || !enoughBytesLeft(size) || !stream_.good())
+        return false;
+    std::memcpy(bytes, StreamBufferAccess::getPosition(buffer) + distance, size);
+    StreamBufferAccess::advanceGet(buffer, static_cast<std::size_t>(distance) + size);
+    position_ = streamPosition_ = position_ + size;
+    return true;
+}
 
 } // namespace ZULMetaData::detail

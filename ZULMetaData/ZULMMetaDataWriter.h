@@ -9,6 +9,7 @@
 
 #include "SharedDependencies/EndianFile.h"
 #include "ZULMetaData/CursorImageWriter.h"
+#include "ZULMetaData/StreamBufferAccess.h"
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
 
@@ -17,6 +18,7 @@
 #include <cstring>
 #include <fstream>
 #include <list>
+#include <memory>
 #include <ostream>
 #include <string>
 
@@ -58,7 +60,10 @@ public:
     ~MetaDataWriter() { close(); }
 
 private:
+    static constexpr std::size_t s_bufferSize = 64 * 1024;
+
     std::string path;
+    std::unique_ptr<char[]> buffer; // outlives the stream that writes out of it
     std::ofstream stream;
     std::int32_t version = 0;
 };
@@ -85,8 +90,8 @@ inline void writeStringEntry(double time, const std::string& text, std::ostream&
     const std::uint32_t size = stringEntrySize(text);
     std::memcpy(prefix.data(), &size, sizeof size);
     std::memcpy(prefix.data() + sizeof size, &time, sizeof time);
-    stream.write(prefix.data(), prefix.size());
-    stream.write(text.data(), static_cast<std::streamsize>(text.size()));
+    writeBytes(stream, prefix.data(), prefix.size());
+    writeBytes(stream, text.data(), text.size());
 }
 
 /// The list has no time of its own: every element repeats it.
@@ -100,11 +105,28 @@ inline void writeStringListEntry(double time, const std::list<std::string>& text
 }
 
 template <FixedSizeValue T>
-void writeFixedEntry(double time, const T& value, std::ostream& stream) {
+void packFixedEntry(double time, const T& value, char* entry) {
+    std::memcpy(entry, &time, sizeof time);
+    std::memcpy(entry + sizeof time, &value, sizeof value);
+}
+
+/// Apart from the fast path, which keeps nothing in memory whose address is known elsewhere.
+template <FixedSizeValue T>
+[[gnu::noinline]] void writeFixedEntryAcrossBlocks(double time, T value, std::ostream& stream) {
     std::array<char, sizeof(double) + sizeof(T)> entry;
-    std::memcpy(entry.data(), &time, sizeof time);
-    std::memcpy(entry.data() + sizeof time, &value, sizeof value);
-    stream.write(entry.data(), entry.size());
+    packFixedEntry(time, value, entry.data());
+    writeAcrossBlocks(stream, entry.data(), entry.size());
+}
+
+template <FixedSizeValue T>
+void writeFixedEntry(double time, const T& value, std::ostream& stream) {
+    constexpr std::size_t size = sizeof(double) + sizeof(T);
+    if (char* place = placeFor(stream, size)) {
+        packFixedEntry(time, value, place);
+        StreamBufferAccess::advancePut(*stream.rdbuf(), size);
+    } else {
+        writeFixedEntryAcrossBlocks(time, value, stream);
+    }
 }
 
 } // namespace detail
@@ -125,8 +147,12 @@ template <StreamValue T, class A, class B>
 void MetaDataWriter<T, A, B>::init(const std::string& filePath, const uuid& typeUuid, int streamVersion) {
     version = streamVersion;
     path = filePath;
+    if (!buffer)
+        buffer = std::make_unique<char[]>(s_bufferSize);
+    stream.rdbuf()->pubsetbuf(buffer.get(), s_bufferSize);
     fileOpen(stream, path.c_str(), std::ios_base::binary | std::ios_base::out | std::ios_base::trunc);
     writeHeader(typeUuid, version);
+    detail::StreamBufferAccess::shortenPutArea(*stream.rdbuf(), s_metaDataHeaderSize); // blocks end on page boundaries
 }
 
 template <StreamValue T, class A, class B>

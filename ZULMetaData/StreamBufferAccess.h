@@ -1,0 +1,66 @@
+#pragma once
+
+// The inside of a stream buffer: bytes go straight into its put area and come straight out of its get area. A call
+// of `write` or `read` on a stream costs five to twenty times as much as the 16 bytes of an entry that it moves.
+// The streams stay usable by anybody in between, for the areas are always left as the buffer itself would leave them.
+
+#include <cstddef>
+#include <cstring>
+#include <istream>
+#include <ostream>
+#include <streambuf>
+
+namespace ZULMetaData::detail {
+
+/// Names the protected members of a stream buffer from within a class derived from it, which is what makes pointers
+/// to them usable on any stream buffer.
+class StreamBufferAccess : private std::streambuf {
+public:
+    static std::size_t room(const std::streambuf& buffer) {
+        return static_cast<std::size_t>((buffer.*&StreamBufferAccess::epptr)() - (buffer.*&StreamBufferAccess::pptr)());
+    }
+    static std::size_t capacity(const std::streambuf& buffer) {
+        return static_cast<std::size_t>((buffer.*&StreamBufferAccess::epptr)() -
+                                        (buffer.*&StreamBufferAccess::pbase)());
+    }
+    static char* putPosition(const std::streambuf& buffer) { return (buffer.*&StreamBufferAccess::pptr)(); }
+    static void advancePut(std::streambuf& buffer, std::size_t count) {
+        (buffer.*&StreamBufferAccess::pbump)(static_cast<int>(count));
+    }
+
+    /// Gives the put area, which is empty, `less` bytes less until it is written out for the first time.
+    static void shortenPutArea(std::streambuf& buffer, std::size_t less) {
+        if (room(buffer) > less)
+            (buffer.*&StreamBufferAccess::setp)(putPosition(buffer), (buffer.*&StreamBufferAccess::epptr)() - less);
+    }
+
+    static std::size_t available(const std::streambuf& buffer) {
+        return static_cast<std::size_t>((buffer.*&StreamBufferAccess::egptr)() - (buffer.*&StreamBufferAccess::gptr)());
+    }
+    static const char* getPosition(const std::streambuf& buffer) { return (buffer.*&StreamBufferAccess::gptr)(); }
+    static void advanceGet(std::streambuf& buffer, std::size_t count) {
+        (buffer.*&StreamBufferAccess::gbump)(static_cast<int>(count));
+    }
+};
+
+/// Where `size` bytes can be put right now, to be followed by `StreamBufferAccess::advancePut`; else null.
+inline char* placeFor(std::ostream& stream, std::size_t size) {
+    const bool isPlain = stream.good() && !(stream.flags() & std::ios_base::unitbuf);
+    std::streambuf& buffer = *stream.rdbuf();
+    return isPlain && StreamBufferAccess::room(buffer) >= size ? StreamBufferAccess::putPosition(buffer) : nullptr;
+}
+
+/// Fills the put area to its end before it is written out, so that blocks keep one size.
+void writeAcrossBlocks(std::ostream& stream, const char* bytes, std::size_t size);
+
+/// As `stream.write`, at the cost of a copy where the put area has room.
+inline void writeBytes(std::ostream& stream, const char* bytes, std::size_t size) {
+    if (char* place = placeFor(stream, size)) {
+        std::memcpy(place, bytes, size);
+        StreamBufferAccess::advancePut(*stream.rdbuf(), size);
+    } else {
+        writeAcrossBlocks(stream, bytes, size);
+    }
+}
+
+} // namespace ZULMetaData::detail
