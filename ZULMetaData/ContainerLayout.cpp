@@ -30,8 +30,11 @@ detail::PositionedInput inputAt(std::istream& stream, std::uint64_t position, st
 bool readAtom(detail::PositionedInput& input, ContainerItem& atom) {
     std::uint32_t type = 0;
     atom.offset = input.position();
-    if (!input.readAtomHeader(atom.sizeField, atom.size, type))
+    if (!input.readBigEndian(atom.sizeField) || !input.readBigEndian(type))
         return false;
+    atom.size = atom.sizeField;
+    if (atom.sizeField < detail::s_atomHeaderSize && !input.readBigEndian(atom.size) && atom.sizeField != 0)
+        return false; // an open end needs no more bytes
     atom.type = fourCharacters(swapInt(type));
     atom.headerSize = input.position() - atom.offset;
     return true;

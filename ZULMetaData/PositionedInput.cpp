@@ -57,16 +57,12 @@ bool PositionedInput::readBigEndian(std::uint64_t& value) {
     return true;
 }
 
-bool PositionedInput::readAtomHeader(std::uint32_t& sizeField, std::uint64_t& size, std::uint32_t& type) {
-    if (!enoughBytesLeft(s_atomHeaderSize) || !readBigEndian(sizeField) || !readBigEndian(type))
-        return false;
-    size = sizeField;
-    return sizeField >= s_atomHeaderSize || readBigEndian(size);
-}
-
 bool PositionedInput::readAtomSizeAndType(std::uint64_t& size, std::uint32_t& type) {
-    std::uint32_t sizeField = 0;
-    return readAtomHeader(sizeField, size, type);
+    std::uint32_t shortSize = 0;
+    if (!enoughBytesLeft(s_atomHeaderSize) || !readBigEndian(shortSize) || !readBigEndian(type))
+        return false;
+    size = shortSize;
+    return shortSize >= s_atomHeaderSize || readBigEndian(size);
 }
 
 bool PositionedInput::readChunkTypeAndSize(std::uint32_t& type, std::uint32_t& size) {

@@ -34,9 +34,6 @@ public:
     /// Any 32-bit size below 8 announces an extended size. `size` counts the whole atom, header included.
     bool readAtomSizeAndType(std::uint64_t& size, std::uint32_t& type);
 
-    /// The same, with the 32-bit number as it is stored.
-    bool readAtomHeader(std::uint32_t& sizeField, std::uint64_t& size, std::uint32_t& type);
-
     /// `type` as it is stored. `size` counts the data alone.
     bool readChunkTypeAndSize(std::uint32_t& type, std::uint32_t& size);
 

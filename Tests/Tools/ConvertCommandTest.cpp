@@ -62,18 +62,20 @@ protected:
 };
 
 TEST_F(ConvertCommand, MasksWhatWasTyped) {
-    const std::string file = keys(typed(1, "pass 1") + key(1.5, s_return));
+    const std::string file = keys(typed(1, "PASS 1") + key(1.5, s_return));
     EXPECT_EQ(converted(file, {"srt"}), "1\n00:00:01,000 --> 00:00:03,000\n" + s_bullet + s_bullet + s_bullet +
                                             s_bullet + s_bullet + s_bullet + " [returnKey]\n\n");
-    EXPECT_EQ(converted(file, {"srt", "--show-keys"}), "1\n00:00:01,000 --> 00:00:03,000\npass 1 [returnKey]\n\n");
+    EXPECT_EQ(converted(file, {"srt", "--show-keys"}), "1\n00:00:01,000 --> 00:00:03,000\nPASS 1 [returnKey]\n\n");
 }
 
 TEST_F(ConvertCommand, MasksEveryKeyThatTypesACharacter) {
     std::string entries;
     for (std::uint32_t code = 0; code < 0x180; ++code) {
-        const bool isSpecial = (code >= 3 && code <= 47 && code != 32) || (code >= 112 && code <= 145) || code == 0;
-        for (const std::uint32_t flags : {0U, s_virtualKey, s_shift, s_command})
+        const bool isNamed = (code >= 3 && code <= 47 && code != 32) || (code >= 112 && code <= 145) || code == 0;
+        for (const std::uint32_t flags : {0U, s_virtualKey, s_shift, s_command}) {
+            const bool isSpecial = isNamed && (flags == s_virtualKey || code < 32 || code == 127);
             entries += isSpecial ? "" : key(code, code, flags);
+        }
     }
     std::istringstream lines(converted(keys(entries), {"vtt"}));
     std::getline(lines, entries);
@@ -93,6 +95,11 @@ TEST_F(ConvertCommand, ShowsModifiersAsTheirSigns) {
                                                                    "C\n"));
 }
 
+TEST_F(ConvertCommand, NamesKeysThatCannotBeCharacters) {
+    EXPECT_THAT(converted(keys(key(1, 115, s_virtualKey) + key(1, 39, s_virtualKey) + key(1, 's')), {"srt"}),
+                HasSubstr("\n[f4] [right] " + s_bullet + "\n"));
+}
+
 TEST_F(ConvertCommand, ShowsWhatVirtualKeysType) {
     const std::uint32_t shifted = s_virtualKey | s_shift;
     const std::string file = keys(key(1, 'A', s_virtualKey) + key(1, 'B', shifted) + key(1, '1', s_virtualKey) +
@@ -108,9 +115,9 @@ TEST_F(ConvertCommand, MakesACaptionOfKeysBetweenPauses) {
 }
 
 TEST_F(ConvertCommand, BreaksLongLinesAndJoinsWhatBeginsTogether) {
-    const std::string text = converted(keys(typed(1, std::string(60, 'x')) + typed(1.2, "y")), {"srt", "--show-keys"});
-    EXPECT_EQ(text, "1\n00:00:01,000 --> 00:00:02,700\n" + std::string(42, 'x') + " \xc2\xb7 " + std::string(18, 'x') +
-                        "y\n\n");
+    const std::string text = converted(keys(typed(1, std::string(60, 'X')) + typed(1.2, "Y")), {"srt", "--show-keys"});
+    EXPECT_EQ(text, "1\n00:00:01,000 --> 00:00:02,700\n" + std::string(42, 'X') + " \xc2\xb7 " + std::string(18, 'X') +
+                        "Y\n\n");
 }
 
 TEST_F(ConvertCommand, RoundsTimesAndCountsHours) {
@@ -143,7 +150,7 @@ TEST_F(ConvertCommand, MakesAChapterOfEveryChangeOfTitles) {
     const std::string windows = streamHeader("2b7b6a07", 1, 0) + textEntry(0, "Mail") + textEntry(1, "Mail") +
                                 textEntry(2, "") + textEntry(3, "\xff");
     const std::string file = write("movie.mp4", tinyMovie() + zulmAtom({slides, windows}));
-    EXPECT_EQ(converted(file, {"chapters"}), "CHAPTER01=00:00:00.000\nCHAPTER01NAME=Intro \xc2\xb7 Mail\n"
+    EXPECT_EQ(converted(file, {"chapters"}), "CHAPTER01=00:00:00.000\nCHAPTER01NAME=Mail \xc2\xb7 Intro\n"
                                              "CHAPTER02=00:00:02.000\nCHAPTER02NAME=(untitled)\n"
                                              "CHAPTER03=00:00:03.000\nCHAPTER03NAME=\xef\xbf\xbd\n"
                                              "CHAPTER04=00:00:04.000\nCHAPTER04NAME=End\n");

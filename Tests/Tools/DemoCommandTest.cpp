@@ -18,7 +18,7 @@ TEST_F(DemoCommand, MakesARecordingThatReadsBackAsItWasRecorded) {
     const ToolResult result = runTool({"demo", folder / "new/place"});
     EXPECT_EQ(result.exitCode, 0) << result.errors;
     EXPECT_THAT(result.output,
-                HasSubstr("cursorLocation            1200     0.000    19.983     19224   as recorded\n"));
+                HasSubstr("cursorLocation           1200     0.000    19.983     19224   as recorded\n"));
     EXPECT_THAT(result.output, HasSubstr("Everything that was recorded has been read back.\n"));
     EXPECT_EQ(runTool({"verify", folder / "new/place/Recording.mp4"}).exitCode, 0);
     EXPECT_THAT(runTool({"info", folder / "new/place/Recording.mp4"}).output, HasSubstr("movie, 20.000 s, "));

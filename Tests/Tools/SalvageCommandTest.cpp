@@ -83,7 +83,7 @@ TEST_F(SalvageCommand, SearchesASparseMovieWhoseRepairedSizeLeavesEightBytesOver
     writeSparseFile(file, size, atom("ftyp", "mp42") + atom("wide") + be32(0) + "mdat");
     ASSERT_TRUE(ZULMAtomRepair::finalizeAtomsInFile(file));
     writeFile(folder / "locations.dat", locationStream());
-    ZULMAtomWriter().writeMetaDataFiles({folder / "locations.dat"}, file);
+    ASSERT_TRUE(MP4MetaData::appendMetaDataFiles(file, {folder / "locations.dat"})); // without another repair
     EXPECT_EQ(runTool({"extract", file, "-o", folder / "none"}).exitCode, 4);
     const ToolResult result = runTool({"salvage", file, "-o", folder / "out", "--json"});
     EXPECT_EQ(result.exitCode, 3);

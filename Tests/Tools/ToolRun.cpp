@@ -99,14 +99,6 @@ void readFrom(int& descriptor, std::string& text) {
         closeEnd(descriptor);
 }
 
-void writeTo(int& descriptor, const std::string& input, std::size_t& written) {
-    const ssize_t size = write(descriptor, input.data() + written, input.size() - written);
-    if (size > 0)
-        written += static_cast<std::size_t>(size);
-    if (size < 0 || written == input.size())
-        closeEnd(descriptor);
-}
-
 class Conversation {
 public:
     Conversation(pid_t child, const ToolOptions& options, int input, int output, int errors)
@@ -116,31 +108,44 @@ public:
     }
 
     ToolResult finish() {
-        while (output_ >= 0 || errors_ >= 0 || input_ >= 0)
+        while (output_ >= 0 || errors_ >= 0 || isWriting())
             if (!exchange())
                 break;
-        closeEnd(input_);
         result_.exitCode = waitForEnd();
+        closeEnd(input_);
         return result_;
     }
 
 private:
     bool exchange() {
-        std::array<pollfd, 3> channels{{{output_, POLLIN, 0}, {errors_, POLLIN, 0}, {input_, POLLOUT, 0}}};
+        std::array<pollfd, 3> channels{
+            {{output_, POLLIN, 0}, {errors_, POLLIN, 0}, {isWriting() ? input_ : -1, POLLOUT, 0}}};
         poll(channels.data(), channels.size(), 20);
         if (channels[0].revents != 0)
             readFrom(output_, result_.output);
         if (channels[1].revents != 0)
             readFrom(errors_, result_.errors);
-        if (channels[2].revents != 0)
-            writeTo(input_, options_.input, written_);
+        if (channels[2].revents != 0 && !write())
+            closeEnd(input_);
         return !mustStop();
+    }
+
+    bool isWriting() const { return input_ >= 0 && written_ < options_.input.size(); }
+
+    /// False where nothing more will be written.
+    bool write() {
+        const ssize_t size = ::write(input_, options_.input.data() + written_, options_.input.size() - written_);
+        if (size > 0)
+            written_ += static_cast<std::size_t>(size);
+        const bool isBlocked = size < 0 && errno == EAGAIN;
+        return isBlocked || (size >= 0 && (isWriting() || options_.keepsInputOpen));
     }
 
     bool mustStop() {
         const auto elapsed = Clock::now() - start_;
         if (options_.killAfterMilliseconds > 0 && !killed_ &&
             elapsed > std::chrono::milliseconds(options_.killAfterMilliseconds)) {
+            options_.beforeKill();
             kill(child_, options_.killSignal);
             killed_ = true;
         }
@@ -182,6 +187,7 @@ ToolResult runProgram(const std::string& program, const std::vector<std::string>
     Ends errors = openChannel(options.errors);
     Ends input = openPipe(); // the other way round: the test writes
     const pid_t child = fork();
+    fcntl(input.program, F_SETFL, O_NONBLOCK); // the program may read slower than it prints
     if (child == 0)
         becomeProgram(program, arguments, options, input.test, output.program, errors.program);
     EXPECT_GT(child, 0) << std::strerror(errno);

@@ -5,6 +5,7 @@
 //     const ToolResult result = runTool({"info", "--json", movie});
 //     EXPECT_EQ(result.exitCode, 0) << result.errors;
 
+#include <functional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -23,11 +24,13 @@ enum class Channel {
 struct ToolOptions {
     std::vector<std::pair<std::string, std::string>> environment; ///< added to the test's own
     std::string input;                                            ///< on standard input, through a pipe
+    bool keepsInputOpen = false;                                  ///< behind it, until the program ends
     Channel output = Channel::Pipe;
     Channel errors = Channel::Pipe;
     std::string folder;            ///< to start in; the test's own where empty
     int killAfterMilliseconds = 0; ///< sends `killSignal` then; 0 is never
     int killSignal = 15;
+    std::function<void()> beforeKill = [] {};
 };
 
 struct ToolResult {

@@ -44,6 +44,10 @@ TEST(ContainerLayout, KeepsThe32BitNumberOfAnOpenEnd) {
     const auto atoms = itemsOf(atom("ftyp") + be32(0) + "mdat" + "pictures");
     ASSERT_EQ(atoms.size(), 2U);
     EXPECT_EQ(atoms[1].sizeField, 0U);
+    const auto shortAtoms = itemsOf(be32(0) + "mdat" + "media");
+    ASSERT_EQ(shortAtoms.size(), 1U);
+    EXPECT_EQ(shortAtoms[0].size, 0U);
+    EXPECT_EQ(shortAtoms[0].headerSize, 8U);
 }
 
 TEST(ContainerLayout, KnowsWhatHoldsMetaDataAndStreams) {

@@ -56,6 +56,10 @@ void* operator new(std::size_t size) {
     return block;
 }
 
+void* operator new(std::size_t size, const std::nothrow_t&) noexcept {
+    return isRefused(size) ? nullptr : __real_malloc(std::max<std::size_t>(size, 1));
+}
+
 void operator delete(void* block) noexcept {
     __real_free(block);
 }

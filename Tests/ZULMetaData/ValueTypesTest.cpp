@@ -6,6 +6,7 @@
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
 #include "Tests/ZULMetaData/CursorImageSamples.h"
+#include "Tests/ZULMetaData/PiecewiseBuffer.h"
 #include "Tests/ZULMetaData/ReadStream.h"
 
 #include <gtest/gtest.h>
@@ -18,9 +19,11 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <istream>
 #include <limits>
 #include <list>
 #include <optional>
+#include <ostream>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -410,7 +413,7 @@ TYPED_TEST(StreamOf, MayBeEmpty) {
 
 TYPED_TEST(StreamOf, MayHaveManyEntriesInARow) {
     std::vector<Sample<TypeParam>> many;
-    for (std::size_t index = 0; index < 3000; ++index)
+    for (std::size_t index = 0; index < 6000; ++index)
         many.push_back(this->samples[index % 3]);
     this->record(many);
     EXPECT_TRUE(contentsOf(this->path) == this->header + this->joined(many));
@@ -422,6 +425,27 @@ TYPED_TEST(StreamOf, GivesWhatThereIsWhereverItIsCut) {
     const std::string bytes = this->joined(three);
     for (std::size_t size = 0; size <= bytes.size(); ++size)
         EXPECT_EQ(readStream<TypeParam>(this->header + bytes.substr(0, size)), this->cut(three, size)) << size;
+}
+
+TYPED_TEST(StreamOf, GivesTheSameInPiecesOfAnySizeWhereverItIsCut) {
+    const std::vector<Sample<TypeParam>> two(this->samples.begin(), this->samples.begin() + 2);
+    const std::string bytes = this->joined(two);
+    for (std::size_t piece = 1; piece <= 50; ++piece)
+        for (std::size_t size = 0; size <= bytes.size(); ++size) {
+            PiecewiseBuffer buffer(piece, this->header + bytes.substr(0, size));
+            std::istream stream(&buffer);
+            EXPECT_EQ(readStream<TypeParam>(stream, 0, 24 + size), this->cut(two, size)) << size << " by " << piece;
+        }
+}
+
+TYPED_TEST(StreamOf, IsStoredTheSameInPiecesOfAnySize) {
+    for (std::size_t piece = 1; piece <= 50; ++piece) {
+        PiecewiseBuffer buffer(piece);
+        std::ostream stream(&buffer);
+        for (const Sample<TypeParam>& sample : this->samples)
+            metaDataWrite<TypeParam>(sample.time, sample.value, stream, Stored<TypeParam>::version);
+        EXPECT_TRUE(buffer.taken() == this->joined(this->samples)) << piece;
+    }
 }
 
 TYPED_TEST(StreamOf, GivesWhatThereIsWhereverItsFileIsCut) {

@@ -452,6 +452,12 @@ TEST(UUIDText, LeavesTheStreamPrintingHexadecimalNumbersFilledWithZeros) {
     EXPECT_EQ(out.fill(), '0');
 }
 
+TEST(UUIDText, IsTheSameWhateverTheStreamWasSetTo) {
+    std::ostringstream out;
+    out << std::uppercase << std::showbase << std::left << std::setfill('*') << std::setw(50) << s_id;
+    EXPECT_EQ(out.str(), s_idText);
+}
+
 TEST(UUIDText, IsReadBack) {
     EXPECT_EQ(parsed(s_idText), s_id);
     EXPECT_EQ(parsed("00000000-0000-0000-0000-000000000001"), withByte(15, 1));
@@ -519,12 +525,11 @@ TEST(UUIDText, TakesTheLeadingDigitsOfEveryPair) {
 
 TEST(UUIDText, ThatIsTooShortFailsTheStreamAndKeepsWhatWasRead) {
     std::istringstream stream("2b7b6");
-    uuid id{};
+    uuid id;
+    std::memset(id.data, 0xee, sizeof id.data);
     stream >> id;
     EXPECT_TRUE(stream.fail());
-    EXPECT_EQ(id.data[0], 0x2b);
-    EXPECT_EQ(id.data[1], 0x7b);
-    EXPECT_EQ(id.data[2], 6);
+    EXPECT_EQ(raw(id), hex("2b7b0600 0000 0000 0000 000000000000"));
 }
 
 TEST(UUIDText, ThatLacksAnyOfItsCharactersFailsTheStream) {

@@ -1,363 +1,627 @@
+// Which streams are read, which of their entries, and what is made of damage.
+
 #include "ZULMetaData/ZULMMetaDataReader.h"
 
 #include "Tests/Support/Bytes.h"
+#include "Tests/Support/Files.h"
+#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/MemoryWatch.h"
+#include "Tests/ZULMetaData/ReadStream.h"
+#include "Tests/ZULMetaData/StandardOutput.h"
 
+#include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <bit>
+#include <cstddef>
+#include <cstdint>
+#include <fstream>
 #include <limits>
+#include <list>
+#include <new>
 #include <sstream>
 #include <stdexcept>
+#include <streambuf>
+#include <string>
+#include <vector>
 
-namespace ZULMetaData {
+namespace ZULMetaData::Test {
 
 namespace {
 
-using namespace Test;
-using testing::internal::CaptureStdout;
-using testing::internal::GetCapturedStdout;
+using testing::Each;
+using testing::ElementsAre;
+using testing::IsEmpty;
 
-constexpr auto s_refused = "MetaDataReader<T>::parseFile - Version is larger than what we can handle\n";
-constexpr auto s_unknown = "MetaDataUUID::currentVersionForUUID - unsupported UUID = "
-                           "00000000-0000-0000-0000-000000000000\n";
+using Texts = std::list<std::string>;
 
-const std::string s_locations = streamHeader("2b7b6af2", 1, 16);
-const std::string s_titles = streamHeader("2b7b6af8", 1, 0);
-const std::string s_systemData = streamHeader("2b7b6afc", 1, 0);
+const std::string s_refused = "MetaDataReader<T>::parseFile - Version is larger than what we can handle\n";
+const std::string s_unknown =
+    "MetaDataUUID::currentVersionForUUID - unsupported UUID = 00000000-0000-0000-0000-000000000000\n";
 
-std::string point(double time, std::uint32_t x, std::uint32_t y) {
-    return f64(time) + le32(x) + le32(y);
+constexpr const char* s_invalidEntry = "invalid meta data entry";
+
+// ---- Supported versions ---------------------------------------------------------------------------------------
+
+template <class T = Point>
+bool isSupported(const uuid& type, std::int32_t streamVersion, int version) {
+    return MetaDataReader<T>::IsSupportedVersion(MetaDataHeader{type, streamVersion, 0}, version);
 }
 
-template <class T>
-struct Collector : DataStreamObserver<T> {
-    std::vector<double> times;
-    std::vector<T> values;
-    std::size_t limit = std::numeric_limits<std::size_t>::max();
+TEST(SupportedVersion, IsAnyUpToTheCurrentOneWhereNoneIsAskedFor) {
+    EXPECT_TRUE(isSupported(s_cursorImageUUID, 1, -1));
+    EXPECT_TRUE(isSupported(s_cursorImageUUID, 2, -1));
+    EXPECT_FALSE(isSupported(s_cursorImageUUID, 3, -1));
+    EXPECT_TRUE(isSupported(s_cursorLocationUUID, 1, -1));
+    EXPECT_FALSE(isSupported(s_cursorLocationUUID, 2, -1));
+}
 
-    bool dataRead(double time, const T& value) override {
-        times.push_back(time);
-        values.push_back(value);
-        return values.size() < limit;
-    }
-};
+TEST(SupportedVersion, IsNeverBelowOneWhereNoneIsAskedFor) {
+    for (const std::int32_t version : {0, -1, -2, std::numeric_limits<std::int32_t>::min()})
+        EXPECT_FALSE(isSupported(s_cursorLocationUUID, version, -1)) << version;
+}
 
-template <class T>
-class Reading {
-public:
-    explicit Reading(const std::string& bytes) : stream(bytes), length_(bytes.size()) {}
+TEST(SupportedVersion, IsAlsoExactlyTheOneAskedFor) {
+    EXPECT_TRUE(isSupported(s_cursorImageUUID, 3, 3));
+    EXPECT_TRUE(isSupported(s_cursorLocationUUID, 0, 0));
+    EXPECT_TRUE(isSupported(s_cursorLocationUUID, -5, -5));
+    EXPECT_TRUE(isSupported(s_cursorLocationUUID, 2147483647, 2147483647));
+}
 
-    void parse(int version = -1) { parse(0, length_, version); }
-    void parse(std::uint64_t start, std::uint64_t length, int version = -1) {
-        MetaDataReader<T>::parseStream(observer, stream, start, length, version);
-    }
+TEST(SupportedVersion, IsNoOtherThanTheOneAskedFor) {
+    EXPECT_FALSE(isSupported(s_cursorImageUUID, 3, 2));
+    EXPECT_FALSE(isSupported(s_cursorImageUUID, 3, 4));
+    EXPECT_FALSE(isSupported(s_cursorLocationUUID, 0, 1));
+    EXPECT_FALSE(isSupported(s_cursorLocationUUID, -5, 5));
+}
 
+TEST(SupportedVersion, IsStillAnyUpToTheCurrentOneWhereAnotherIsAskedFor) {
+    EXPECT_TRUE(isSupported(s_cursorImageUUID, 1, 2));
+    EXPECT_TRUE(isSupported(s_cursorImageUUID, 2, 1));
+    EXPECT_TRUE(isSupported(s_cursorImageUUID, 2, 100));
+}
+
+TEST(SupportedVersion, OfAnUnknownKindIsOnlyTheOneAskedForAndTheKindIsReportedEachTime) {
+    EXPECT_EQ(printedBy([] { EXPECT_FALSE(isSupported(uuid{}, 1, -1)); }), s_unknown);
+    EXPECT_EQ(printedBy([] { EXPECT_FALSE(isSupported(uuid{}, 1, 2)); }), s_unknown);
+    EXPECT_EQ(printedBy([] { EXPECT_TRUE(isSupported(uuid{}, 1, 1)); }), s_unknown);
+}
+
+TEST(SupportedVersion, BelowOneOfAnUnknownKindIsNotReported) {
+    EXPECT_EQ(printedBy([] { EXPECT_FALSE(isSupported(uuid{}, 0, -1)); }), "");
+    EXPECT_EQ(printedBy([] { EXPECT_FALSE(isSupported(uuid{}, -1, -1)); }), "");
+    EXPECT_EQ(printedBy([] { EXPECT_TRUE(isSupported(uuid{}, 0, 0)); }), "");
+}
+
+template <class... Types>
+void expectTheSameRuleForEvery() {
+    EXPECT_TRUE((isSupported<Types>(s_cursorImageUUID, 2, -1) && ...));
+    EXPECT_TRUE((isSupported<Types>(s_cursorImageUUID, 3, 3) && ...));
+    EXPECT_FALSE((isSupported<Types>(s_cursorImageUUID, 3, -1) || ...));
+    EXPECT_FALSE((isSupported<Types>(s_cursorImageUUID, 3, 2) || ...));
+}
+
+TEST(SupportedVersion, DoesNotDependOnTheValueType) {
+    expectTheSameRuleForEvery<Point, Rect, KeyStroke, int, float, double, std::string, Texts, CursorImage>();
+}
+
+// ---- Streams of points ----------------------------------------------------------------------------------------
+
+/// Points whose coordinates number the entries: (1,1), (2,2) and so on.
+class StreamReader : public testing::Test {
+protected:
+    const std::string header = streamHeader("2b7b6af2", 1, 16);
+    Entries<Point> points;
     std::istringstream stream;
-    Collector<T> observer;
 
-private:
-    std::uint64_t length_;
+    static std::string entry(std::int32_t number) { return pointEntry(number * 0.5, number, number); }
+
+    std::string threePoints() const { return header + entry(1) + entry(2) + entry(3); }
+
+    void parse(std::uint64_t start, std::uint64_t length, int version = -1) {
+        MetaDataReader<Point>::parseStream(points, stream, start, length, version);
+    }
+
+    /// From the first byte to the last.
+    void parse(const std::string& bytes, int version = -1) {
+        stream.str(bytes);
+        parse(0, bytes.size(), version);
+    }
+
+    /// Where whoever reads on would do so. Asking takes a stream that has not failed.
+    std::streamoff position() {
+        stream.clear();
+        return stream.tellg();
+    }
 };
 
-MetaDataHeader headerOf(const uuid& type, int version) {
-    MetaDataHeader header;
-    header.uuid = type;
-    header.version = version;
-    return header;
+TEST_F(StreamReader, DeliversEveryEntryInOrder) {
+    parse(threePoints());
+    EXPECT_THAT(points.times, ElementsAre(0.5, 1.0, 1.5));
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1), Point(2, 2), Point(3, 3)));
 }
 
-TEST(SupportedVersions, MinusOneAcceptsEveryVersionUpToTheCurrentOne) {
-    for (int version = 1; version <= 2; ++version)
-        EXPECT_TRUE(MetaDataReader<CursorImage>::IsSupportedVersion(headerOf(s_cursorImageUUID, version), -1));
-    for (int version : {-2, -1, 0, 3})
-        EXPECT_FALSE(MetaDataReader<CursorImage>::IsSupportedVersion(headerOf(s_cursorImageUUID, version), -1));
+TEST_F(StreamReader, DeliversNothingOfAHeaderAlone) {
+    EXPECT_EQ(printedBy([this] { parse(header); }), "");
+    EXPECT_THAT(points.values, IsEmpty());
 }
 
-TEST(SupportedVersions, AnExplicitVersionIsAcceptedHoweverNewOrOld) {
-    EXPECT_TRUE(MetaDataReader<int>::IsSupportedVersion(headerOf(s_cursorImageUUID, 3), 3));
-    EXPECT_TRUE(MetaDataReader<int>::IsSupportedVersion(headerOf(s_cursorLocationUUID, 0), 0));
-    EXPECT_TRUE(MetaDataReader<int>::IsSupportedVersion(headerOf(s_cursorLocationUUID, -5), -5));
-    EXPECT_TRUE(MetaDataReader<int>::IsSupportedVersion(headerOf(s_cursorImageUUID, 1), 2));
-    EXPECT_FALSE(MetaDataReader<int>::IsSupportedVersion(headerOf(s_cursorLocationUUID, 0), 1));
-    EXPECT_FALSE(MetaDataReader<int>::IsSupportedVersion(headerOf(s_cursorImageUUID, 3), 2));
+TEST_F(StreamReader, DoesNotNeedTheEntrySizeOfTheHeader) {
+    for (const std::uint32_t size : {0U, 1U, 24U, 0xffffffffU})
+        parse(streamHeader("2b7b6af2", 1, size) + entry(1));
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1), Point(1, 1), Point(1, 1), Point(1, 1)));
 }
 
-TEST(SupportedVersions, AnUnknownKindIsNamedOncePerCheck) {
-    CaptureStdout();
-    EXPECT_FALSE(MetaDataReader<Point>::IsSupportedVersion(headerOf(uuid{}, 1), -1));
-    EXPECT_EQ(GetCapturedStdout(), s_unknown);
-    CaptureStdout();
-    EXPECT_TRUE(MetaDataReader<Point>::IsSupportedVersion(headerOf(uuid{}, 1), 1));
-    EXPECT_EQ(GetCapturedStdout(), s_unknown);
+TEST_F(StreamReader, DoesNotNeedTheKindOfItsValues) {
+    parse(streamHeader("2b7b6af1", 2, 0) + entry(1));
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1)));
 }
 
-TEST(SupportedVersions, AnUnknownKindWithoutAPositiveVersionIsNotNamed) {
-    CaptureStdout();
-    EXPECT_FALSE(MetaDataReader<Point>::IsSupportedVersion(headerOf(uuid{}, 0), -1));
-    EXPECT_EQ(GetCapturedStdout(), "");
+// ---- Headers --------------------------------------------------------------------------------------------------
+
+TEST_F(StreamReader, RefusesALaterVersionWithOneLine) {
+    EXPECT_EQ(printedBy([this] { parse(streamHeader("2b7b6af2", 2, 16) + entry(1)); }), s_refused);
+    EXPECT_THAT(points.values, IsEmpty());
 }
 
-TEST(StreamReader, DeliversEveryEntryInOrder) {
-    Reading<Point> reading(s_locations + point(0.5, 1, 2) + point(0.25, 3, 4));
-    reading.parse();
-    EXPECT_EQ(reading.observer.times, (std::vector<double>{0.5, 0.25}));
-    EXPECT_EQ(reading.observer.values, (std::vector<Point>{{1, 2}, {3, 4}}));
+TEST_F(StreamReader, RefusesAVersionBelowOneWithTheSameLine) {
+    EXPECT_EQ(printedBy([this] { parse(streamHeader("2b7b6af2", 0, 16) + entry(1)); }), s_refused);
+    EXPECT_EQ(printedBy([this] { parse(streamHeader("2b7b6af2", -1, 16) + entry(1)); }), s_refused);
+    EXPECT_EQ(printedBy([this] { parse(streamHeader("2b7b6af2", 0, 16) + entry(1), 1); }), s_refused);
+    EXPECT_THAT(points.values, IsEmpty());
 }
 
-TEST(StreamReader, AHeaderAloneDeliversNothing) {
-    Reading<Point> reading(s_locations);
-    CaptureStdout();
-    reading.parse();
-    EXPECT_EQ(GetCapturedStdout(), "");
-    EXPECT_TRUE(reading.observer.values.empty());
+TEST_F(StreamReader, ReadsAnyVersionThatIsAskedFor) {
+    parse(streamHeader("2b7b6af2", 2, 16) + entry(1), 2);
+    parse(streamHeader("2b7b6af2", 0, 16) + entry(2), 0);
+    parse(streamHeader("2b7b6af2", -7, 16) + entry(3), -7);
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1), Point(2, 2), Point(3, 3)));
 }
 
-TEST(StreamReader, AHeaderCutShortDeliversNothing) {
-    for (std::size_t size = 0; size < 24; ++size) {
-        Reading<Point> reading(s_locations.substr(0, size));
-        CaptureStdout();
-        reading.parse(1);
-        const bool versionIsThere = size >= 20;
-        EXPECT_EQ(GetCapturedStdout(), versionIsThere ? "" : s_refused) << size;
-        EXPECT_TRUE(reading.observer.values.empty()) << size;
+TEST_F(StreamReader, ReportsAnUnknownKindInFrontOfItsRefusal) {
+    const std::string unknown = std::string(16, '\0') + hex("01000000 10000000") + entry(1);
+    EXPECT_EQ(printedBy([&] { parse(unknown); }), s_unknown + s_refused);
+    EXPECT_THAT(points.values, IsEmpty());
+}
+
+TEST_F(StreamReader, ReadsAnUnknownKindOfTheVersionAskedFor) {
+    const std::string unknown = std::string(16, '\0') + hex("01000000 10000000") + entry(1);
+    EXPECT_EQ(printedBy([&] { parse(unknown, 1); }), s_unknown);
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1)));
+}
+
+TEST_F(StreamReader, RefusesInTheSameWordsForEveryValueType) {
+    const std::string bytes = streamHeader("2b7b6af1", 3, 0) + "entries";
+    EXPECT_EQ(printedBy([&] { readStream<std::string>(bytes); }), s_refused);
+    EXPECT_EQ(printedBy([&] { readStream<Texts>(bytes); }), s_refused);
+    EXPECT_EQ(printedBy([&] { readStream<CursorImage>(bytes); }), s_refused);
+    EXPECT_EQ(printedBy([&] { readStream<double>(bytes); }), s_refused);
+}
+
+TEST_F(StreamReader, DoesNotFlushItsRefusal) {
+    FlushCounter output;
+    parse(streamHeader("2b7b6af2", 2, 16));
+    EXPECT_EQ(output.str(), s_refused);
+    EXPECT_EQ(output.flushes(), 0);
+}
+
+TEST_F(StreamReader, RefusesAHeaderThatEndsInFrontOfItsVersion) {
+    for (std::size_t size = 0; size < 20; ++size)
+        EXPECT_EQ(printedBy([&] { parse(header.substr(0, size)); }), s_refused) << size;
+    EXPECT_THAT(points.values, IsEmpty());
+}
+
+TEST_F(StreamReader, StopsSilentlyWhereAHeaderEndsBehindItsVersion) {
+    for (std::size_t size = 20; size < 24; ++size)
+        EXPECT_EQ(printedBy([&] { parse(header.substr(0, size)); }), "") << size;
+    EXPECT_THAT(points.values, IsEmpty());
+}
+
+TEST_F(StreamReader, RefusesAStartBehindTheEndOfTheInput) {
+    stream.str(threePoints());
+    EXPECT_EQ(printedBy([this] { parse(1000, 72); }), s_refused);
+    EXPECT_THAT(points.values, IsEmpty());
+}
+
+TEST_F(StreamReader, RefusesAStartBeyondEveryPosition) {
+    stream.str(threePoints());
+    EXPECT_EQ(printedBy([this] { parse(0xffffffffffffff00, 72); }), s_refused);
+    EXPECT_THAT(points.values, IsEmpty());
+}
+
+// ---- Where a stream ends --------------------------------------------------------------------------------------
+
+TEST_F(StreamReader, ReadsOnlyItsStretchOfAContainer) {
+    const std::string rects = streamHeader("2b7b6a09", 1, 24) + f64(0.5) + raw(1) + raw(2) + raw(3) + raw(4);
+    std::istringstream container(std::string(100, 'x') + rects + rects.substr(24) + "more");
+    Entries<Rect> entries;
+    MetaDataReader<Rect>::parseStream(entries, container, 100, 48, -1);
+    EXPECT_THAT(entries.values, ElementsAre(Rect(1, 2, 3, 4)));
+}
+
+TEST_F(StreamReader, DoesNotBeginAnEntryAtTheEndOrBehindIt) {
+    stream.str(threePoints());
+    parse(0, 24 + 2 * 16);
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1), Point(2, 2)));
+}
+
+TEST_F(StreamReader, EntryThatBeginsBeforeTheEndIsReadWhole) {
+    stream.str(threePoints());
+    parse(0, 24 + 16 + 1);
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1), Point(2, 2)));
+}
+
+TEST_F(StreamReader, ReadsTheHeaderWhateverItsLengthIsButNoEntryInsideIt) {
+    for (const std::uint64_t length : {0, 1, 23, 24}) {
+        stream.str(threePoints());
+        EXPECT_EQ(printedBy([&] { parse(0, length); }), "") << length;
+        stream.str(streamHeader("2b7b6af2", 2, 16));
+        EXPECT_EQ(printedBy([&] { parse(0, length); }), s_refused) << length;
     }
+    EXPECT_THAT(points.values, IsEmpty());
 }
 
-TEST(StreamReader, ARefusedVersionIsNamedAndDeliversNothing) {
-    Reading<Point> reading(streamHeader("2b7b6af2", 2, 16) + point(0, 1, 2));
-    CaptureStdout();
-    reading.parse();
-    EXPECT_EQ(GetCapturedStdout(), s_refused);
-    EXPECT_TRUE(reading.observer.values.empty());
+TEST_F(StreamReader, ReadsAnEntryWhereTheLengthHasOneByteOfIt) {
+    stream.str(threePoints());
+    parse(0, 25);
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1)));
 }
 
-TEST(StreamReader, AnUnknownKindIsNamedInFrontOfTheRefusal) {
-    Reading<Point> reading(std::string(16, '\0') + le32(1) + le32(16) + point(0, 1, 2));
-    CaptureStdout();
-    reading.parse();
-    EXPECT_EQ(GetCapturedStdout(), std::string(s_unknown) + s_refused);
+TEST_F(StreamReader, EndsWithTheInputWhereItsLengthGoesBeyond) {
+    stream.str(threePoints());
+    parse(0, 0x7fffffffffffffff);
+    EXPECT_EQ(points.values.size(), 3U);
 }
 
-TEST(StreamReader, ReadsAnUnknownKindOfExactlyTheVersionAskedFor) {
-    Reading<Point> reading(std::string(16, '\0') + le32(4) + le32(16) + point(0, 1, 2));
-    CaptureStdout();
-    reading.parse(4);
-    EXPECT_EQ(GetCapturedStdout(), s_unknown);
-    EXPECT_EQ(reading.observer.values, std::vector<Point>{Point(1, 2)});
+TEST_F(StreamReader, EndsAtOnceWhereItsEndWrapsAround) {
+    stream.str("0123456789" + threePoints());
+    parse(10, 0xfffffffffffffff8);
+    EXPECT_THAT(points.values, IsEmpty());
 }
 
-TEST(StreamReader, AFileEndingInsideATimeThrowsAfterTheEntriesInFrontOfIt) {
-    Reading<Point> reading(s_locations + point(1, 1, 1) + f64(2).substr(0, 4));
-    try {
-        reading.parse();
-        FAIL() << "nothing was thrown";
-    } catch (const std::runtime_error& error) {
-        EXPECT_STREQ(error.what(), "invalid meta data entry");
+TEST_F(StreamReader, TakesTheInputForCutWhereItsLengthPromisesEntriesBehindABareHeader) {
+    stream.str(header);
+    EXPECT_THROW(parse(0, 40), std::runtime_error);
+}
+
+TEST_F(StreamReader, ReadsStreamsBeyondFourGiB) {
+    constexpr std::uint64_t start = 5ULL << 30;
+    const TemporaryFolder folder;
+    writeSparseFile(folder / "Movie.mov", start + threePoints().size(), "", threePoints());
+    std::ifstream movie(folder / "Movie.mov", std::ios_base::binary);
+    MetaDataReader<Point>::parseStream(points, movie, start, 72, -1);
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1), Point(2, 2), Point(3, 3)));
+}
+
+// ---- The state of the input -----------------------------------------------------------------------------------
+
+TEST_F(StreamReader, DeliversTheSameTwiceInARow) {
+    stream.str(threePoints());
+    parse(0, 72);
+    parse(0, 72);
+    EXPECT_THAT(points.times, ElementsAre(0.5, 1.0, 1.5, 0.5, 1.0, 1.5));
+    EXPECT_EQ(points.values.size(), 6U);
+}
+
+TEST_F(StreamReader, ClearsWhateverStateTheInputIsIn) {
+    for (const auto state : {std::ios_base::eofbit, std::ios_base::failbit, std::ios_base::badbit}) {
+        stream.str(header + entry(1));
+        stream.setstate(state);
+        parse(0, 40);
     }
-    EXPECT_EQ(reading.observer.values.size(), 1U);
-    EXPECT_TRUE(reading.stream.eof());
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1), Point(1, 1), Point(1, 1)));
 }
 
-TEST(StreamReader, AFileEndingInsideAValueDeliversWhatIsThere) {
-    Reading<Point> reading(s_locations + point(1, 1, 1) + point(2, 0x01020304, 5).substr(0, 10));
-    reading.parse();
-    EXPECT_EQ(reading.observer.values, (std::vector<Point>{{1, 1}, {0x0304, 0}}));
-    EXPECT_EQ(reading.observer.times[1], 2);
-    EXPECT_TRUE(reading.stream.eof());
+TEST_F(StreamReader, ReadsSeveralStreamsOfOneInput) {
+    stream.str(header + entry(1) + header + entry(2));
+    parse(40, 40);
+    parse(0, 40);
+    EXPECT_THAT(points.values, ElementsAre(Point(2, 2), Point(1, 1)));
 }
 
-TEST(StreamReader, AFileEndingBehindATimeDeliversTheDefaultValue) {
-    Reading<double> reading(streamHeader("2b7b6af3", 1, 16) + f64(2));
-    reading.parse();
-    EXPECT_EQ(reading.observer.values, std::vector<double>{0});
+TEST_F(StreamReader, ReportsTheEndOfTheInputBehindTheLastEntry) {
+    parse(threePoints());
+    EXPECT_TRUE(stream.eof());
+    EXPECT_FALSE(stream.fail());
+    EXPECT_EQ(position(), 72);
 }
 
-TEST(StreamReader, ReadsOnlyItsStretchOfALongerFile) {
-    const std::string rect = f64(1) + le32(1) + le32(2) + le32(3) + le32(4);
-    Reading<Rect> reading(std::string(100, 'x') + streamHeader("2b7b6a09", 1, 24) + rect + rect + rect);
-    reading.parse(100, 48);
-    EXPECT_EQ(reading.observer.values, std::vector<Rect>{Rect(1, 2, 3, 4)});
+TEST_F(StreamReader, LeavesAnInputThatGoesOnBehindTheLastEntry) {
+    stream.str(threePoints() + "more");
+    parse(0, 72);
+    EXPECT_TRUE(stream.good());
+    EXPECT_EQ(position(), 72);
 }
 
-TEST(StreamReader, AnEntryThatBeginsInFrontOfTheEndIsReadWhole) {
-    Reading<Point> reading(s_locations + point(1, 1, 1) + point(2, 2, 2) + point(3, 3, 3));
-    reading.parse(0, 24 + 16 + 1);
-    EXPECT_EQ(reading.observer.values.size(), 2U);
+// ---- Observers ------------------------------------------------------------------------------------------------
+
+TEST_F(StreamReader, StopsWhereTheObserverHasEnough) {
+    points.limit = 2;
+    parse(threePoints());
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1), Point(2, 2)));
+    EXPECT_TRUE(stream.good());
+    EXPECT_EQ(position(), 56);
 }
 
-TEST(StreamReader, ALengthThatWrapsAroundDeliversNothing) {
-    Reading<Point> reading("0123456789" + s_locations + point(1, 1, 1));
-    reading.parse(10, std::numeric_limits<std::uint64_t>::max() - 7);
-    EXPECT_TRUE(reading.observer.values.empty());
+TEST_F(StreamReader, DoesNotLookBehindTheEntryThatWasEnough) {
+    points.limit = 3;
+    parse(threePoints());
+    EXPECT_TRUE(stream.good());
+    EXPECT_EQ(position(), 72);
 }
 
-TEST(StreamReader, ALengthBeyondTheFileEndsWithTheFile) {
-    Reading<Point> reading(s_locations + point(1, 1, 1));
-    reading.parse(0, std::uint64_t{1} << 62);
-    EXPECT_EQ(reading.observer.values.size(), 1U);
+TEST_F(StreamReader, DoesNotTouchDamageBehindTheEntryThatWasEnough) {
+    points.limit = 1;
+    parse(header + entry(1) + "torn");
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1)));
 }
 
-TEST(StreamReader, AStartThatNoFilePositionHoldsDeliversNothing) {
-    Reading<Point> reading(s_locations + point(1, 1, 1));
-    CaptureStdout();
-    reading.parse(std::numeric_limits<std::uint64_t>::max() - 100, 40);
-    EXPECT_EQ(GetCapturedStdout(), s_refused);
-    EXPECT_TRUE(reading.observer.values.empty());
-}
-
-TEST(StreamReader, TheSameStreamCanBeParsedAgain) {
-    Reading<Point> reading(s_locations + point(1, 1, 1) + point(2, 2, 2));
-    reading.parse();
-    EXPECT_TRUE(reading.stream.eof());
-    reading.parse();
-    EXPECT_EQ(reading.observer.values.size(), 4U);
-}
-
-TEST(StreamReader, ClearsAFailedStateFirst) {
-    Reading<Point> reading(s_locations + point(1, 1, 1));
-    reading.stream.setstate(std::ios_base::failbit | std::ios_base::badbit);
-    reading.parse();
-    EXPECT_EQ(reading.observer.values.size(), 1U);
-}
-
-TEST(StreamReader, AnObserverEndsTheParseBehindItsEntry) {
-    Reading<Point> reading(s_locations + point(1, 1, 1) + point(2, 2, 2) + point(3, 3, 3));
-    reading.observer.limit = 2;
-    reading.parse();
-    EXPECT_EQ(reading.observer.values.size(), 2U);
-    EXPECT_TRUE(reading.stream.good());
-    EXPECT_EQ(reading.stream.tellg(), std::streampos(24 + 32));
-}
-
-TEST(StreamReader, WhatAnObserverThrowsReachesTheCaller) {
-    struct Thrower : DataStreamObserver<Point> {
-        bool dataRead(double, const Point&) override { throw std::logic_error("enough"); }
+TEST_F(StreamReader, LetsExceptionsOfTheObserverThrough) {
+    struct Thrower final : DataStreamObserver<Point> {
+        bool dataRead(double, const Point& point) override {
+            return point.x < 2 ? true : throw std::logic_error("enough");
+        }
     } thrower;
-    std::istringstream stream(s_locations + point(1, 1, 1) + point(2, 2, 2));
-    EXPECT_THROW(MetaDataReader<Point>::parseStream(thrower, stream, 0, 56, -1), std::logic_error);
-    EXPECT_EQ(stream.tellg(), std::streampos(24 + 16));
+    stream.str(threePoints());
+    EXPECT_THROW(MetaDataReader<Point>::parseStream(thrower, stream, 0, 72, -1), std::logic_error);
+    EXPECT_EQ(position(), 56);
+    parse(0, 72);
+    EXPECT_EQ(points.values.size(), 3U);
 }
 
-TEST(StreamReader, TheStreamStandsBehindEveryEntryWhileItIsDelivered) {
-    struct Watcher : DataStreamObserver<Point> {
-        explicit Watcher(std::istream& watched) : stream(watched) {}
+TEST_F(StreamReader, StandsBehindAnEntryWhileItIsDelivered) {
+    struct Witness final : DataStreamObserver<Point> {
+        explicit Witness(std::istream& in) : input(in) {}
         bool dataRead(double, const Point&) override {
-            positions.push_back(stream.tellg());
+            positions.push_back(input.tellg());
             return true;
         }
-        std::istream& stream;
+        std::istream& input;
         std::vector<std::streamoff> positions;
-    };
-    std::istringstream stream(s_locations + point(1, 1, 1) + point(2, 2, 2) + point(3, 3, 3));
-    Watcher watcher(stream);
-    MetaDataReader<Point>::parseStream(watcher, stream, 0, 72, -1);
-    EXPECT_EQ(watcher.positions, (std::vector<std::streamoff>{40, 56, 72}));
+    } witness(stream);
+    stream.str(threePoints());
+    MetaDataReader<Point>::parseStream(witness, stream, 0, 72, -1);
+    EXPECT_THAT(witness.positions, ElementsAre(40, 56, 72));
 }
 
-TEST(StreamReader, SeesTheEndOfTheInputRightBehindTheLastEntry) {
-    Reading<Point> reading(s_locations + point(1, 1, 1));
-    reading.parse();
-    EXPECT_TRUE(reading.stream.eof());
-    EXPECT_FALSE(reading.stream.fail());
+// ---- Entries that are cut short -------------------------------------------------------------------------------
+
+TEST_F(StreamReader, ThrowsInsideATimeBehindTheEntriesBefore) {
+    EXPECT_THROW(parse(header + entry(1) + entry(2) + entry(3).substr(0, 4)), std::runtime_error);
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1), Point(2, 2)));
+    EXPECT_TRUE(stream.eof());
 }
 
-TEST(StringReader, ReadsTextsWithAnyBytes) {
-    Reading<std::string> reading(s_titles + le32(11) + f64(1) + hex("61 00 ff") + le32(8) + f64(2));
-    reading.parse();
-    EXPECT_EQ(reading.observer.values, (std::vector<std::string>{std::string("a\0\xff", 3), ""}));
-    EXPECT_EQ(reading.observer.times, (std::vector<double>{1, 2}));
+TEST_F(StreamReader, SaysThatTheEntryIsInvalid) {
+    const Reading reading = readStream<Point>(header + "torn");
+    EXPECT_EQ(reading.error, "invalid meta data entry");
 }
 
-TEST(StringReader, RepeatsTheLastCharacterForEveryMissingOne) {
-    Reading<std::string> reading(s_titles + le32(8 + 6) + f64(1) + "abc");
-    reading.parse();
-    EXPECT_EQ(reading.observer.values, std::vector<std::string>{"abcccc"});
+TEST_F(StreamReader, DeliversAValueCutShortWithZerosForTheRest) {
+    parse(header + entry(1) + f64(1.0) + hex("0a0b0c0d 1e"));
+    EXPECT_THAT(points.values, ElementsAre(Point(1, 1), Point(0x0d0c0b0a, 0x1e)));
+    EXPECT_THAT(points.times, ElementsAre(0.5, 1.0));
+    EXPECT_TRUE(stream.eof());
 }
 
-TEST(StringReader, FillsWithZerosWhereNoCharacterIsThere) {
-    Reading<std::string> reading(s_titles + le32(8 + 3) + f64(1));
-    reading.parse();
-    EXPECT_EQ(reading.observer.values, std::vector<std::string>{std::string(3, '\0')});
+TEST_F(StreamReader, DeliversATimeWithoutAValue) {
+    parse(header + f64(1.0));
+    EXPECT_THAT(points.values, ElementsAre(Point(0, 0)));
+    EXPECT_THAT(points.times, ElementsAre(1.0));
 }
 
-TEST(StringReader, RepeatsTheLastCharacterOfALongTextToo) {
-    Reading<std::string> reading(s_titles + le32(8 + 20000) + f64(1) + std::string(9999, 'a') + "z");
-    reading.parse();
-    EXPECT_EQ(reading.observer.values, std::vector<std::string>{std::string(9999, 'a') + std::string(10001, 'z')});
+/// A device that fails behind its last byte instead of ending there.
+class BrokenBuffer : public std::stringbuf {
+public:
+    using std::stringbuf::stringbuf;
+
+protected:
+    int_type underflow() override { throw std::runtime_error("device failed"); }
+};
+
+TEST_F(StreamReader, TakesADeviceThatFailsForOneThatEnds) {
+    BrokenBuffer buffer(header + entry(1) + "torn");
+    std::istream broken(&buffer);
+    const Reading reading = readStream<Point>(broken, 0, 56);
+    EXPECT_EQ(reading.entries.size(), 1U);
+    EXPECT_EQ(reading.error, s_invalidEntry);
 }
 
-TEST(StringReader, ThrowsWhereTheSizeIsCutShort) {
-    for (std::size_t size = 1; size < 4; ++size) {
-        Reading<std::string> reading(s_titles + le32(9) + f64(1) + "a" + le32(9).substr(0, size));
-        EXPECT_THROW(reading.parse(), std::runtime_error) << size;
-        EXPECT_EQ(reading.observer.values, std::vector<std::string>{"a"});
+// ---- One entry ------------------------------------------------------------------------------------------------
+
+template <class T>
+struct Entry {
+    double time = -1.0;
+    T value{};
+    std::string error;
+
+    /// Reads the first of these bytes.
+    explicit Entry(const std::string& bytes, T before = T()) : value(before) {
+        std::istringstream stream(bytes);
+        try {
+            metaDataRead<T>(stream, &time, &value, 1);
+        } catch (const std::runtime_error& exception) {
+            error = exception.what();
+        }
+    }
+};
+
+TEST(EntryReader, BeginsAtThePositionOfTheInputAndStopsBehindTheEntry) {
+    std::istringstream stream("front" + pointEntry(1.5, 10, -4) + "behind");
+    stream.seekg(5);
+    double time = 0;
+    Point point;
+    metaDataRead<Point>(stream, &time, &point, 1);
+    EXPECT_EQ(time, 1.5);
+    EXPECT_EQ(point, Point(10, -4));
+    EXPECT_EQ(stream.tellg(), 21);
+}
+
+TEST(EntryReader, KeepsWhatAValueHeldBehindTheCut) {
+    EXPECT_EQ(Entry<Point>(pointEntry(1.5, 10, -4).substr(0, 12), Point(1, 2)).value, Point(10, 2));
+}
+
+TEST(EntryReader, ThrowsWithoutAWholeTime) {
+    for (std::size_t size = 0; size < 8; ++size)
+        EXPECT_EQ(Entry<double>(f64(0.25).substr(0, size)).error, s_invalidEntry) << size;
+}
+
+// ---- Texts ----------------------------------------------------------------------------------------------------
+
+TEST(TextReader, ReadsAnyBytes) {
+    const Entry<std::string> entry(hex("0e000000 0000000000001440 000aff0dc3bc"));
+    EXPECT_EQ(entry.time, 5.0);
+    EXPECT_EQ(entry.value, std::string("\0\n\xff\r\xc3\xbc", 6));
+}
+
+TEST(TextReader, ReadsAnEmptyText) {
+    const Entry<std::string> entry(hex("08000000 0000000000001440") + "behind");
+    EXPECT_EQ(entry.time, 5.0);
+    EXPECT_EQ(entry.value, "");
+}
+
+TEST(TextReader, AppendsToTheTextThatWasThere) {
+    EXPECT_EQ(Entry<std::string>(textEntry(5.0, "bc"), "a").value, "abc");
+}
+
+TEST(TextReader, RepeatsTheLastCharacterForThoseThatAreMissing) {
+    EXPECT_EQ(Entry<std::string>(hex("12000000 0000000000001440") + "abc").value, "abcccccccc");
+}
+
+TEST(TextReader, RepeatsTheLastCharacterWhereverALongTextIsCut) {
+    const std::string whole = std::string(5000, 'x') + std::string(5000, 'y');
+    for (const std::size_t size : {1U, 4095U, 4096U, 4097U, 5001U, 8191U, 8192U, 8193U, 9999U}) {
+        const std::string bytes = textEntry(5.0, whole).substr(0, 12 + size);
+        const std::string text = whole.substr(0, size) + std::string(10000 - size, size > 5000 ? 'y' : 'x');
+        EXPECT_TRUE(Entry<std::string>(bytes).value == text) << size;
     }
 }
 
-TEST(StringReader, AppendsToTheTextThatItIsGiven) {
-    std::istringstream stream(le32(10) + f64(7) + "bc");
-    double time = 0;
-    std::string text = "a";
-    metaDataRead(stream, &time, &text, 1);
-    EXPECT_EQ(text, "abc");
-    EXPECT_EQ(time, 7);
+TEST(TextReader, RepeatsNothingOfTheTextThatWasThere) {
+    EXPECT_EQ(Entry<std::string>(hex("0a000000 0000000000001440"), "a").value, std::string("a\0\0", 3));
 }
 
-TEST(ListReader, DropsTheTimesOfItsElements) {
-    Reading<std::list<std::string>> reading(s_systemData + le32(31) + le32(2) + le32(9) + f64(5) + "a" + le32(10) +
-                                            f64(5) + "bc" + le32(4) + le32(0));
-    reading.parse();
-    EXPECT_EQ(reading.observer.times, (std::vector<double>{0, 0}));
-    EXPECT_EQ(reading.observer.values, (std::vector<std::list<std::string>>{{"a", "bc"}, {}}));
+TEST(TextReader, FillsATextWithZerosOfWhichNoCharacterIsThere) {
+    EXPECT_EQ(Entry<std::string>(hex("0b000000 0000000000001440")).value, std::string(3, '\0'));
+    EXPECT_EQ(Entry<std::string>(hex("0b000000")).value, std::string(3, '\0'));
 }
 
-TEST(ListReader, BelievesTheCountAndNotTheTotal) {
-    Reading<std::list<std::string>> reading(s_systemData + le32(999) + le32(1) + le32(9) + f64(5) + "a");
-    reading.parse();
-    EXPECT_EQ(reading.observer.values, (std::vector<std::list<std::string>>{{"a"}}));
+TEST(TextReader, KeepsWhatATimeHeldBehindTheCut) {
+    EXPECT_EQ(Entry<std::string>(hex("08000000") + f64(-2.0).substr(0, 6)).time, -1.0);
+    EXPECT_EQ(Entry<std::string>(hex("08000000") + hex("000000000000 00")).time,
+              std::bit_cast<double>(0xbf00000000000000));
 }
 
-TEST(ListReader, ThrowsWhereAnElementIsMissing) {
-    Reading<std::list<std::string>> reading(s_systemData + le32(31) + le32(0xffffffff) + le32(9) + f64(5) + "a");
-    EXPECT_THROW(reading.parse(), std::runtime_error);
+TEST(TextReader, ThrowsWithoutAWholeSize) {
+    for (std::size_t size = 0; size < 4; ++size)
+        EXPECT_EQ(Entry<std::string>(hex("080000").substr(0, size)).error, s_invalidEntry) << size;
 }
 
-TEST(ListReader, DeliversAListWhoseLastElementIsCutShort) {
-    Reading<std::list<std::string>> reading(s_systemData + le32(18) + le32(1) + le32(12) + f64(5) + "ab");
-    reading.parse();
-    EXPECT_EQ(reading.observer.values, (std::vector<std::list<std::string>>{{"abbb"}}));
+TEST(TextReader, WrapsASizeBelowThatOfTheTimeAround) {
+    for (std::uint32_t size = 0; size < 8; ++size) {
+        MemoryWatch memory;
+        memory.refuseAbove(1U << 30);
+        EXPECT_THROW(Entry<std::string>(le32(size) + f64(5.0) + "abc"), std::bad_alloc) << size;
+        EXPECT_GE(memory.largestRequest(), 0x100000000 + size - 8) << size;
+        EXPECT_LT(memory.largestRequest(), 0x100000000 + 64) << size;
+    }
 }
 
-TEST(ListReader, ThrowsWhereTheTotalIsCutShort) {
-    Reading<std::list<std::string>> reading(s_systemData + le32(4) + le32(0) + "xy");
-    EXPECT_THROW(reading.parse(), std::runtime_error);
-    EXPECT_EQ(reading.observer.values.size(), 1U);
+TEST(TextReader, AsksForLittleMoreMemoryThanThereIsInputUntilItEnds) {
+    MemoryWatch memory;
+    memory.refuseAbove(1U << 20);
+    EXPECT_THROW(Entry<std::string>(hex("ffffff7f 0000000000001440") + std::string(100000, 'x')), std::bad_alloc);
+    EXPECT_GE(memory.largestRequest(), 0x7ffffff7U);
 }
 
-TEST(CursorImageReading, AVersionWithoutFieldsDeliversOneEntryAndEnds) {
-    Reading<CursorImage> reading(streamHeader("2b7b6af1", 0, 0) + std::string(100, 'x'));
-    reading.parse(0);
-    EXPECT_EQ(reading.observer.values, std::vector<CursorImage>(1));
+TEST(TextReader, ReadsTheNextEntryBehindTheText) {
+    const std::string header = streamHeader("2b7b6af9", 1, 0);
+    const Reading reading = readStream<std::string>(header + textEntry(0.25, "a") +
+                                                    textEntry(0.25, std::string(9000, 'x')) + textEntry(0.25, "bc"));
+    EXPECT_THAT(reading.entries,
+                ElementsAre("000000000000d03f \"a\"", "000000000000d03f \"" + std::string(9000, 'x') + '"',
+                            "000000000000d03f \"bc\""));
 }
 
-TEST(EntryReader, ReadsOneEntryAtThePositionOfTheStream) {
-    std::istringstream stream("skip" + point(1.5, 7, 8) + "rest");
-    stream.seekg(4);
-    double time = 0;
-    Point value;
-    metaDataRead(stream, &time, &value, 1);
-    EXPECT_EQ(time, 1.5);
-    EXPECT_EQ(value, Point(7, 8));
-    EXPECT_EQ(stream.tellg(), std::streampos(20));
+// ---- Lists of texts -------------------------------------------------------------------------------------------
+
+/// The list "a", "bc" at time 5.
+const std::string s_list = hex("1f000000 02000000 09000000 0000000000001440 61 0a000000 0000000000001440 6263");
+
+TEST(ListReader, DeliversAListAtTimeZero) {
+    Entries<Texts> lists;
+    std::istringstream stream(streamHeader("2b7b6afc", 1, 0) + s_list + s_list);
+    MetaDataReader<Texts>::parseStream(lists, stream, 0, 24 + 2 * s_list.size(), -1);
+    EXPECT_THAT(lists.times, ElementsAre(0.0, 0.0));
+    EXPECT_THAT(lists.values, Each(Texts{"a", "bc"}));
 }
 
-TEST(EntryReader, KeepsWhatTheInputDoesNotReplace) {
-    std::istringstream stream(point(1.5, 7, 8).substr(0, 12));
-    double time = 0;
-    Point value(1, 2);
-    metaDataRead(stream, &time, &value, 1);
-    EXPECT_EQ(value, Point(7, 2));
+TEST(ListReader, LeavesTheTimeAlone) {
+    const Entry<Texts> entry(s_list);
+    EXPECT_EQ(entry.time, -1.0);
+    EXPECT_EQ(entry.value, (Texts{"a", "bc"}));
+}
+
+TEST(ListReader, AppendsToTheListThatWasThere) {
+    EXPECT_EQ(Entry<Texts>(s_list, {"before"}).value, (Texts{"before", "a", "bc"}));
+}
+
+TEST(ListReader, DoesNotNeedTheTotal) {
+    for (const std::uint32_t total : {0U, 4U, 0xffffffffU})
+        EXPECT_EQ(Entry<Texts>(le32(total) + s_list.substr(4)).value, (Texts{"a", "bc"})) << total;
+}
+
+TEST(ListReader, ReadsAsManyTextsAsAreCounted) {
+    EXPECT_EQ(Entry<Texts>(hex("1f000000 01000000") + s_list.substr(8)).value, (Texts{"a"}));
+    EXPECT_EQ(Entry<Texts>(hex("1f000000 00000000") + s_list.substr(8)).value, Texts());
+}
+
+TEST(ListReader, TakesAMissingCountForNone) {
+    const Entry<Texts> entry(hex("1f000000"));
+    EXPECT_EQ(entry.error, "");
+    EXPECT_EQ(entry.value, Texts());
+}
+
+TEST(ListReader, ThrowsWithoutAWholeTotal) {
+    for (std::size_t size = 0; size < 4; ++size)
+        EXPECT_EQ(Entry<Texts>(s_list.substr(0, size)).error, s_invalidEntry) << size;
+}
+
+TEST(ListReader, ThrowsWhereACountedTextHasNoWholeSize) {
+    for (const std::size_t size : {5U, 7U, 8U, 11U, 20U, 21U, 24U})
+        EXPECT_EQ(Entry<Texts>(s_list.substr(0, size)).error, s_invalidEntry) << size;
+}
+
+TEST(ListReader, ThrowsWhereFewerTextsAreThereThanCounted) {
+    EXPECT_EQ(Entry<Texts>(hex("1f000000 03000000") + s_list.substr(8)).error, s_invalidEntry);
+    EXPECT_EQ(Entry<Texts>(hex("1f000000 ffffffff") + s_list.substr(8)).error, s_invalidEntry);
+}
+
+TEST(ListReader, DeliversItsLastTextCutShort) {
+    EXPECT_EQ(Entry<Texts>(s_list.substr(0, s_list.size() - 1)).value, (Texts{"a", "bb"}));
+    EXPECT_EQ(Entry<Texts>(s_list.substr(0, s_list.size() - 2)).value, (Texts{"a", std::string(2, '\0')}));
+}
+
+// ---- Cursor images --------------------------------------------------------------------------------------------
+
+TEST(CursorImageStream, IsReadInTheVersionOfItsHeaderWhateverIsAskedFor) {
+    const std::string entry = hex("1d000000 000000000000d03f 0700000000000000 09000000 03000000 feffffff 21");
+    for (const int version : {-1, 1, 2})
+        EXPECT_THAT(readStream<CursorImage>(streamHeader("2b7b6af1", 1, 0) + entry, version).entries,
+                    ElementsAre("000000000000d03f id 7, hotspot 3 -2, type -1, flags 3, 1 bytes 21"))
+            << version;
+}
+
+TEST(CursorImageStream, OfAVersionWithoutFieldsDeliversOneEntryAndEnds) {
+    for (const int version : {0, -2, 100}) {
+        const std::string header = streamHeader("2b7b6af1", version, 0);
+        EXPECT_THAT(readStream<CursorImage>(header + std::string(100, 'x'), version).entries,
+                    ElementsAre("0000000000000000 id 0, hotspot 0 0, type -1, flags 3, no image"))
+            << version;
+        EXPECT_THAT(readStream<CursorImage>(header, version).entries, IsEmpty()) << version;
+    }
 }
 
 } // namespace
 
-} // namespace ZULMetaData
+} // namespace ZULMetaData::Test

@@ -3,17 +3,15 @@
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
 
 #include "Tests/Support/Bytes.h"
+#include "Tests/ZULMetaData/StandardOutput.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <cstddef>
 #include <cstring>
-#include <iostream>
 #include <set>
-#include <sstream>
 #include <string>
-#include <utility>
 #include <vector>
 
 namespace ZULMetaData::Test {
@@ -67,30 +65,6 @@ const std::vector<Kind> s_kinds = {
     {"hoverRect", s_hoverRectUUID, "2b7b6a09-7a1f-11e2-83d0-0017f200be7f", 1},
 };
 
-/// Counts how often the program made sure that its output is out.
-class FlushCounter : public std::stringbuf {
-public:
-    FlushCounter() : original_(std::cout.rdbuf(this)) {}
-    ~FlushCounter() override { std::cout.rdbuf(original_); }
-
-    int flushes = 0;
-
-protected:
-    int sync() override {
-        ++flushes;
-        return 0;
-    }
-
-private:
-    std::streambuf* original_;
-};
-
-std::pair<int, std::string> versionAndOutputFor(const uuid& type) {
-    testing::internal::CaptureStdout();
-    const int version = MetaDataUUID::currentVersionForUUID(type);
-    return {version, testing::internal::GetCapturedStdout()};
-}
-
 /// Of an identifier's text.
 std::string bytesOf(std::string text) {
     text.erase(std::remove(text.begin(), text.end(), '-'), text.end());
@@ -109,11 +83,11 @@ TEST(Kinds, HaveTheirIdentifiers) {
 }
 
 TEST(Kinds, HaveTheirCurrentVersionsAndSayNothing) {
-    for (const Kind& kind : s_kinds) {
-        const auto [version, output] = versionAndOutputFor(kind.constant);
-        EXPECT_EQ(version, kind.version) << kind.name;
-        EXPECT_EQ(output, "") << kind.name;
-    }
+    const std::string output = printedBy([] {
+        for (const Kind& kind : s_kinds)
+            EXPECT_EQ(MetaDataUUID::currentVersionForUUID(kind.constant), kind.version) << kind.name;
+    });
+    EXPECT_EQ(output, "");
 }
 
 TEST(Kinds, AreRegisteredInThisOrder) {
@@ -156,17 +130,18 @@ const std::vector<std::string> s_unknown = {
 
 TEST(UnknownKind, HasNoVersionAndIsReported) {
     for (const std::string& id : s_unknown) {
-        const auto [version, output] = versionAndOutputFor(identifier(id));
-        EXPECT_EQ(version, -1) << id;
+        const std::string output =
+            printedBy([&id] { EXPECT_EQ(MetaDataUUID::currentVersionForUUID(identifier(id)), -1) << id; });
         EXPECT_EQ(output, "MetaDataUUID::currentVersionForUUID - unsupported UUID = " + id + "\n");
     }
 }
 
 TEST(UnknownKind, IsReportedEveryTimeItIsAskedFor) {
-    testing::internal::CaptureStdout();
-    MetaDataUUID::currentVersionForUUID(uuid{});
-    MetaDataUUID::currentVersionForUUID(uuid{});
-    EXPECT_EQ(testing::internal::GetCapturedStdout(),
+    const std::string output = printedBy([] {
+        MetaDataUUID::currentVersionForUUID(uuid{});
+        MetaDataUUID::currentVersionForUUID(uuid{});
+    });
+    EXPECT_EQ(output,
               "MetaDataUUID::currentVersionForUUID - unsupported UUID = 00000000-0000-0000-0000-000000000000\n"
               "MetaDataUUID::currentVersionForUUID - unsupported UUID = 00000000-0000-0000-0000-000000000000\n");
 }
@@ -174,14 +149,15 @@ TEST(UnknownKind, IsReportedEveryTimeItIsAskedFor) {
 TEST(UnknownKind, IsReportedAtOnce) {
     FlushCounter output;
     MetaDataUUID::currentVersionForUUID(uuid{});
-    EXPECT_EQ(output.flushes, 1);
+    EXPECT_EQ(output.flushes(), 1);
 }
 
-TEST(UnknownKind, IsNotFound) {
-    testing::internal::CaptureStdout();
-    for (const std::string& id : s_unknown)
-        EXPECT_EQ(findMetaDataKind(identifier(id)), nullptr) << id;
-    EXPECT_EQ(testing::internal::GetCapturedStdout(), "");
+TEST(UnknownKind, IsNotFoundAndNotReportedThen) {
+    const std::string output = printedBy([] {
+        for (const std::string& id : s_unknown)
+            EXPECT_EQ(findMetaDataKind(identifier(id)), nullptr) << id;
+    });
+    EXPECT_EQ(output, "");
 }
 
 } // namespace

@@ -329,6 +329,18 @@ TEST_F(StreamWriter, FailsWhereTheLastBytesCannotBeWrittenOnClosing) {
     EXPECT_TRUE(writer.getStream().fail());
 }
 
+TEST_F(StreamWriter, KeepsTheBeginningOfTheStreamWhereTheDiskFillsUp) {
+    constexpr std::size_t room = 200000;
+    FileSizeLimit limit(room);
+    open();
+    std::string whole = header;
+    for (int index = 0; index < 20000; ++index, whole += entry)
+        write(false);
+    writer.close();
+    EXPECT_TRUE(writer.getStream().fail());
+    EXPECT_TRUE(stored() == whole.substr(0, room));
+}
+
 using StreamWriterDeathTest = StreamWriter;
 
 TEST_F(StreamWriterDeathTest, EndsTheProcessWhereClosingThrowsInTheDestructor) {
@@ -364,6 +376,32 @@ TEST_F(StreamWriter, LetsItsStreamTakeOtherBytes) {
     stream << "abc";
     write(true);
     EXPECT_EQ(stored(), header + "abc" + entry);
+}
+
+TEST_F(StreamWriter, LetsItsStreamFlushByItself) {
+    open();
+    writer.getStream() << std::unitbuf;
+    write(false);
+    EXPECT_EQ(stored(), header + entry);
+}
+
+TEST_F(StreamWriter, LosesNothingWhereItIsOpenedAgainWithoutHavingBeenClosed) {
+    open();
+    write(false);
+    writer.init(folder / "Other.dat", s_hoverRectUUID, 1);
+    EXPECT_TRUE(writer.getStream().fail());
+    writer.close();
+    EXPECT_EQ(stored(), header + entry);
+}
+
+TEST_F(StreamWriter, MayBeginAnotherFileWhenItWasClosed) {
+    open();
+    write(false);
+    writer.close();
+    writer.init(folder / "Other.dat", s_scrollActionUUID, 1);
+    write(true);
+    EXPECT_EQ(stored(), header + entry);
+    EXPECT_EQ(contentsOf(folder / "Other.dat"), hex("2b7b6a05 7a1f 11e2 83d0 0017f200be7f 01000000 10000000") + entry);
 }
 
 TEST_F(StreamWriter, GivesItsStreamThroughItsOnlyVirtualOperation) {

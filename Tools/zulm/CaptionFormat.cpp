@@ -66,7 +66,7 @@ std::string vttText(const std::string& text) {
         case '&': return "&amp;";
         case '<': return "&lt;";
         case '>': return "&gt;";
-        default: return {1, c};
+        default: return std::string(1, c);
         }
     });
 }

@@ -69,9 +69,9 @@ std::string namedCharacter(std::uint32_t code, bool isShiftedKey) {
     if (code == s_space)
         return " ";
     if (code >= '0' && code <= '9')
-        return {1, isShiftedKey ? s_shiftedDigits[code - '0'] : static_cast<char>(code)};
+        return std::string(1, isShiftedKey ? s_shiftedDigits[code - '0'] : static_cast<char>(code));
     if (code >= s_firstPunctuation && code - s_firstPunctuation < s_punctuation.size())
-        return {1, s_punctuation[code - s_firstPunctuation]};
+        return std::string(1, s_punctuation[code - s_firstPunctuation]);
     return {};
 }
 
@@ -107,6 +107,11 @@ std::string characterOf(const KeyStroke& key, const std::string& name, const Mod
     const bool isShiftedKey = modifiers.has("<Shift>") && modifiers.has("(IsVK)");
     return hasName ? namedCharacter(key.characterCode, isShiftedKey)
                    : unnamedCharacter(key.characterCode, name, modifiers);
+}
+
+/// A code that is not marked as a key's may be a character's: the f4 key has the number of the letter s.
+bool mayBeCharacter(const KeyStroke& key, const Modifiers& modifiers) {
+    return key.characterCode >= ' ' && key.characterCode != 0x7f && !modifiers.has("(IsVK)");
 }
 
 std::size_t lengthOf(const std::string& text) {
@@ -151,7 +156,8 @@ KeyLabel labelOf(const KeyStroke& key, bool showsKeys) {
     const std::string name =
         HumanReadableActions::KeyboardActionCodeToString(static_cast<std::int32_t>(key.characterCode));
     const std::string character = characterOf(key, name, modifiers);
-    if (character.empty())
+    const bool isSpecial = character.empty() && (showsKeys || !mayBeCharacter(key, modifiers));
+    if (isSpecial)
         return {fmt::format("{}[{}]", modifiers.signs(), name), false, name == "returnKey"};
     const std::string shown = showsKeys ? character : s_mask;
     if (modifiers.makeShortcut())

@@ -32,7 +32,8 @@ struct KeyLabel {
     bool endsLine = false; ///< the return key
 };
 
-/// Where `showsKeys` is false, every key that types a character shows as a bullet.
+/// Where `showsKeys` is false, every key that types a character shows as a bullet, and so does one of which that cannot
+/// be told: only what is marked as a virtual key, and control characters, show by their names.
 KeyLabel labelOf(const ZULMetaData::KeyStroke& key, bool showsKeys);
 
 /// Keys that follow one another within `pause` seconds make one caption, up to the end of a line.

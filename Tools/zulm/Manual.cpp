@@ -16,10 +16,9 @@ bool isShown(const CLI::Option* option) {
     return !option->get_group().empty();
 }
 
-/// Validators append to the type's name.
+/// What the option's own description of its value says. Validators would append to it, if they had descriptions.
 std::string valueOf(const CLI::Option& option) {
-    const std::string type = option.get_type_size() == 0 ? std::string() : option.get_type_name();
-    return type.substr(0, type.find(':'));
+    return option.get_type_size() == 0 ? std::string() : option.get_type_name();
 }
 
 ManualOption manualOfOption(const CLI::Option& option) {

@@ -87,7 +87,7 @@ std::string eachCommand(const Manual& manual, const std::string& group, Render r
 
 std::string manPage(const Manual& manual) {
     std::string page =
-        fmt::format(".TH ZULM 1 \"\" \"zulm {}\" \"User Commands\"\n.SH NAME\nzulm \\- metadata of screen "
+        fmt::format(".TH ZULM 1 \"\" \"zulm {}\" \"User Commands\"\n.nh\n.ad l\n.SH NAME\nzulm \\- metadata of screen "
                     "recordings\n.SH SYNOPSIS\n.B zulm\n[\\fIOPTIONS\\fR] \\fICOMMAND\\fR ...\n",
                     ZULM_VERSION);
     page += fmt::format(".SH DESCRIPTION\n{}\n.PP\n{}\n", roff(manual.description), roff(s_aboutOutput));
