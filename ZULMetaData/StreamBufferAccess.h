@@ -28,9 +28,9 @@ public:
         (buffer.*&StreamBufferAccess::pbump)(static_cast<int>(count));
     }
 
-    /// Gives the put area, which is empty, `less` bytes less until it is written out for the first time.
+    /// Takes `less` bytes off an empty put area until it is written out for the first time.
     static void shortenPutArea(std::streambuf& buffer, std::size_t less) {
-        if (room(buffer) > less)
+        if (room(buffer) == capacity(buffer) && room(buffer) > less)
             (buffer.*&StreamBufferAccess::setp)(putPosition(buffer), (buffer.*&StreamBufferAccess::epptr)() - less);
     }
 

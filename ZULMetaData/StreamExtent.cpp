@@ -1,38 +1,10 @@
 #include "ZULMetaData/StreamExtent.h"
 
-#include <algorithm>
-#include <cstring>
-#include <vector>
+#include "ZULMetaData/StreamEntries.h"
 
 namespace ZULMetaData {
 
 namespace {
-
-constexpr std::size_t s_windowSize = 1 << 16;
-
-/// Reads small pieces at rising positions out of large ones.
-class Window {
-public:
-    explicit Window(const ReadBytes& read) : read_(read), bytes_(s_windowSize) {}
-
-    template <class Record>
-    bool readAt(std::uint64_t position, Record& record) {
-        if (position < start_ || position + sizeof record > start_ + filled_) {
-            start_ = position;
-            filled_ = read_(position, bytes_);
-        }
-        if (filled_ < sizeof record)
-            return false;
-        std::memcpy(&record, bytes_.data() + (position - start_), sizeof record);
-        return true;
-    }
-
-private:
-    const ReadBytes& read_;
-    std::vector<char> bytes_;
-    std::uint64_t start_ = 0;
-    std::size_t filled_ = 0;
-};
 
 void walkFixedEntries(std::uint64_t length, StreamExtent& extent) {
     extent.entries = (length - s_metaDataHeaderSize) / extent.header.fixedEntrySize;
@@ -40,31 +12,23 @@ void walkFixedEntries(std::uint64_t length, StreamExtent& extent) {
     extent.end = extent.wholeBytes == length ? StreamExtent::AtEntry : StreamExtent::InsideEntry;
 }
 
-void walkSizedEntries(Window& window, std::uint64_t length, StreamExtent& extent) {
-    while (extent.wholeBytes < length) {
-        std::uint32_t size = 0;
-        const std::uint64_t left = length - extent.wholeBytes;
-        extent.end = StreamExtent::InsideEntry;
-        if (left < sizeof size || !window.readAt(extent.wholeBytes, size) || left - sizeof size < size)
-            return;
-        extent.end = size == 0 ? StreamExtent::EmptyEntry : StreamExtent::AtEntry;
-        if (size == 0)
-            return;
-        extent.wholeBytes += sizeof size + size;
+void walkSizedEntries(StreamEntries& entries, StreamExtent& extent) {
+    while (entries.next())
         ++extent.entries;
-    }
+    extent.wholeBytes = entries.wholeBytes();
+    extent.end = entries.end();
 }
 
 } // namespace
 
 std::optional<StreamExtent> measureStream(const ReadBytes& read, std::uint64_t length) {
-    Window window(read);
-    StreamExtent extent;
-    if (length < s_metaDataHeaderSize || !window.readAt(0, extent.header))
+    StreamEntries entries(read, length);
+    if (!entries.header())
         return std::nullopt;
-    extent.wholeBytes = s_metaDataHeaderSize;
+    StreamExtent extent;
+    extent.header = *entries.header();
     if (extent.header.fixedEntrySize == 0)
-        walkSizedEntries(window, length, extent);
+        walkSizedEntries(entries, extent);
     else
         walkFixedEntries(length, extent);
     return extent;

@@ -9,17 +9,19 @@ scripts/install.sh build media
 
 echo "== building"
 cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF >/dev/null
-cmake --build --preset release --target zulm zulm-demo
+cmake --build --preset release --target zulm
 
 echo "== making a movie of 20 seconds"
 mkdir -p "$folder"
 movie=$folder/Recording.mp4
+plain=$(mktemp --suffix=.mp4)
+trap 'rm -f "$plain"' EXIT
 ffmpeg -v error -y -f lavfi -i testsrc2=size=1280x720:rate=30 -f lavfi -i sine=frequency=330 -t 20 \
-    -c:v libx264 -preset ultrafast -pix_fmt yuv420p -c:a aac "$movie"
-packets_before=$(ffmpeg -v error -i "$movie" -map 0 -c copy -f streamhash -)
+    -c:v libx264 -preset ultrafast -pix_fmt yuv420p -c:a aac "$plain"
+packets_before=$(ffmpeg -v error -i "$plain" -map 0 -c copy -f streamhash -)
 
 echo "== recording a session and reading it back out of the movie"
-build/release/Tools/demo/zulm-demo "$folder/streams" "$movie"
+build/release/Tools/zulm/zulm demo "$folder" --movie "$plain" --force
 
 echo "== the movie's pictures and sound are what they were"
 [ "$(ffmpeg -v error -i "$movie" -map 0 -c copy -f streamhash -)" = "$packets_before" ]

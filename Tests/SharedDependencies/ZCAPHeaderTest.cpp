@@ -27,8 +27,8 @@ TEST(ZCAPHeader, HoldsItsVersionAndThenTheCreator) {
     header.creator.setName("Recorder");
     header.creator.setVersion("2021.0.4");
     header.creator.setPlatformVersion("11.2.3");
-    EXPECT_EQ(raw(header), hex("0201000000000000") + "Recorder" + zeros(16) + "2021.0.4" + zeros(8) + "11.2.3" +
-                                   zeros(10));
+    EXPECT_EQ(raw(header),
+              hex("0201000000000000") + "Recorder" + zeros(16) + "2021.0.4" + zeros(8) + "11.2.3" + zeros(10));
 }
 
 TEST(ZCAPHeader, HoldsAVersionOf64Bits) {
@@ -40,8 +40,8 @@ TEST(ZCAPHeader, HoldsAVersionOf64Bits) {
 }
 
 TEST(ZCAPHeader, IsReadAsItLiesOnDisk) {
-    const std::string bytes = hex("0300000000000000") + "Recorder" + zeros(16) + "2021.0.4" + zeros(8) + "11.2.3" +
-                              zeros(10);
+    const std::string bytes =
+        hex("0300000000000000") + "Recorder" + zeros(16) + "2021.0.4" + zeros(8) + "11.2.3" + zeros(10);
     ZCAPHeader header;
     std::memcpy(&header, bytes.data(), sizeof header);
     EXPECT_EQ(header.headerVersion, 3);

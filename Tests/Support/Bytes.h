@@ -31,10 +31,18 @@ std::string raw(T value) {
 }
 
 /// As streams and RIFF chunks store numbers.
-inline std::string le32(std::uint32_t value) { return raw(value); }
-inline std::string le64(std::uint64_t value) { return raw(value); }
-inline std::string f32(float value) { return raw(value); }
-inline std::string f64(double value) { return raw(value); }
+inline std::string le32(std::uint32_t value) {
+    return raw(value);
+}
+inline std::string le64(std::uint64_t value) {
+    return raw(value);
+}
+inline std::string f32(float value) {
+    return raw(value);
+}
+inline std::string f64(double value) {
+    return raw(value);
+}
 
 /// As movie atoms store numbers.
 inline std::string be32(std::uint32_t value) {

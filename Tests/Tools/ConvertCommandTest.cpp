@@ -203,7 +203,7 @@ TEST_F(ConvertCommand, WritesSubtitlesThatFFmpegReads) {
     for (const char* format : {"srt", "vtt", "ass"}) {
         const std::string output = folder / (std::string("out.") + format);
         ASSERT_EQ(runTool({"convert", file, "--to", format, "--show-keys", "-o", output}).exitCode, 0);
-        const ToolResult read = runProgram("ffmpeg", {"-v", "warning", "-i", output, "-f", "null", "-"});
+        const ToolResult read = runProgram("ffmpeg", {"-v", "warning", "-i", output, "-map", "0", "-f", "srt", "-"});
         EXPECT_EQ(read.exitCode, 0);
         EXPECT_EQ(read.errors, "") << format;
         const std::string packets = runProgram("ffprobe", {"-v", "error", "-show_entries",

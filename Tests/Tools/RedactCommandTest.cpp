@@ -112,9 +112,9 @@ TEST_F(RedactCommand, KeepsTheMediaInItsPlace) {
     EXPECT_EQ(copy, atom("free", std::string(before.size() - 8, '\0')) + media() + zulmAtom({hiddenNames()}));
     const std::string old = zulmChunk({appNameStream()});
     const std::string sound = write("sound.avi", riffMedia() + old + ZULMetaData::Test::chunk("IDXX", "odd"));
-    EXPECT_EQ(redacted(sound, {"--titles", "Not"}), riffMedia() +
-                                                        ZULMetaData::Test::chunk("JUNK", std::string(old.size() - 8, '\0')) +
-                                                        ZULMetaData::Test::chunk("IDXX", "odd") + zulmChunk({hiddenNames()}));
+    EXPECT_EQ(redacted(sound, {"--titles", "Not"}),
+              riffMedia() + ZULMetaData::Test::chunk("JUNK", std::string(old.size() - 8, '\0')) +
+                  ZULMetaData::Test::chunk("IDXX", "odd") + zulmChunk({hiddenNames()}));
 }
 
 TEST_F(RedactCommand, PadsOddChunks) {

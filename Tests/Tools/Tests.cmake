@@ -21,5 +21,8 @@ zulm_add_tool_test(Tools/DumpCommandTest)
 zulm_add_tool_test(Tools/InfoCommandTest)
 zulm_add_tool_test(Tools/ManualTest)
 target_compile_definitions(Tools.ManualTest PRIVATE ZULM_DOCS="${PROJECT_SOURCE_DIR}/Docs")
+zulm_add_tool_test(Tools/SchemaTest)
+target_compile_definitions(Tools.SchemaTest PRIVATE
+  ZULM_DOCS="${PROJECT_SOURCE_DIR}/Docs" ZULM_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/Data")
 zulm_add_tool_test(Tools/ToolRunTest)
 include(Tools/VerifyTests.cmake)

@@ -13,6 +13,7 @@
 #include <pty.h>
 #include <sys/resource.h>
 #include <sys/wait.h>
+#include <thread>
 #include <unistd.h>
 
 namespace ZULMetaData::Test {
@@ -121,6 +122,8 @@ private:
         std::array<pollfd, 3> channels{
             {{output_, POLLIN, 0}, {errors_, POLLIN, 0}, {isWriting() ? input_ : -1, POLLOUT, 0}}};
         poll(channels.data(), channels.size(), 20);
+        if (channels[0].revents != 0 && options_.slownessMilliseconds > 0)
+            std::this_thread::sleep_for(std::chrono::milliseconds(options_.slownessMilliseconds));
         if (channels[0].revents != 0)
             readFrom(output_, result_.output);
         if (channels[1].revents != 0)

@@ -162,7 +162,7 @@ public:
 private:
     /// Asking a file for its position costs a call of the system.
     void showProgress() {
-        constexpr std::uint64_t interval = 4096;
+        constexpr std::uint64_t interval = 1024;
         if (!progress_ || read_ % interval != 0)
             return;
         const auto position = static_cast<std::uint64_t>(recording_.parser().getStream().tellg());

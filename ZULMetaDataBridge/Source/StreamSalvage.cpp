@@ -95,12 +95,14 @@ std::optional<DataHeader> dataHeaderAtEndOf(std::string_view before) {
     if (end < s_chunkHeaderSize)
         return std::nullopt;
     const std::size_t extended = end - s_extendedAtomHeaderSize;
+    const auto without = [](std::uint64_t headerSize, std::uint64_t size) {
+        return DataHeader{headerSize, size < headerSize ? 0 : size - headerSize};
+    };
     if (end >= s_extendedAtomHeaderSize && numberAt<std::uint32_t>(before, extended + 4) == type &&
         swapInt(numberAt<std::uint32_t>(before, extended)) == s_extendedSizeMarker)
-        return DataHeader{s_extendedAtomHeaderSize,
-                          swapInt(numberAt<std::uint64_t>(before, chunk)) - s_extendedAtomHeaderSize};
+        return without(s_extendedAtomHeaderSize, swapInt(numberAt<std::uint64_t>(before, chunk)));
     if (numberAt<std::uint32_t>(before, chunk + 4) == type)
-        return DataHeader{s_atomHeaderSize, swapInt(numberAt<std::uint32_t>(before, chunk)) - s_atomHeaderSize};
+        return without(s_atomHeaderSize, swapInt(numberAt<std::uint32_t>(before, chunk)));
     if (numberAt<std::uint32_t>(before, chunk) == type)
         return DataHeader{s_chunkHeaderSize, numberAt<std::uint32_t>(before, chunk + 4)};
     return std::nullopt;

@@ -1,0 +1,147 @@
+// The JSON documents of all commands against the schemas in Docs/schemas. Runs python3 with its jsonschema package.
+
+#include "Tests/Tools/OddFiles.h"
+#include "Tests/Tools/ToolRun.h"
+
+#include <gmock/gmock.h>
+#include <nlohmann/json.hpp>
+
+#include <filesystem>
+
+namespace ZULMetaData::Test {
+namespace {
+
+using nlohmann::json;
+
+std::string schemaOf(const std::string& command) {
+    return std::string(ZULM_DOCS) + "/schemas/zulm." + command + ".schema.json";
+}
+
+class Schema : public RecordedSession {
+protected:
+    /// Fails where the documents do not follow the schema that they name.
+    void expectValid(const std::vector<std::string>& documents) const {
+        ASSERT_FALSE(documents.empty());
+        const std::string schema = json::parse(documents.front()).at("schema");
+        std::vector<std::string> arguments{"-m", "jsonschema", schemaOf(schema.substr(schema.find('.') + 1))};
+        for (std::size_t i = 0; i < documents.size(); ++i) {
+            const std::string file = folder / ("document-" + std::to_string(i) + ".json");
+            writeFile(file, documents[i]);
+            arguments.insert(arguments.end(), {"-i", file});
+        }
+        const ToolResult result = runProgram("/usr/bin/python3", arguments);
+        EXPECT_EQ(result.exitCode, 0) << schema << '\n' << result.errors;
+    }
+
+    std::string outputOf(std::vector<std::string> arguments) const {
+        arguments.emplace_back("--json");
+        return runTool(arguments).output;
+    }
+
+    std::string odd() const { return written("Odd.mp4", oddMovie()); }
+    std::string torn() const { return written("torn.dat", locations() + "1234"); }
+    std::string interrupted() const { return written("interrupted.mp4", tinyMovie() + be32(1) + "ZULM" + be64(0)); }
+
+    std::string written(const std::string& name, const std::string& bytes) const {
+        writeFile(folder / name, bytes);
+        return folder / name;
+    }
+};
+
+TEST_F(Schema, IsOneForEveryCommandThatReports) {
+    std::vector<std::string> commands;
+    for (const auto& file : std::filesystem::directory_iterator(std::string(ZULM_DOCS) + "/schemas")) {
+        const json schema = json::parse(contentsOf(file.path()));
+        const std::string name = schema.at("properties").at("schema").at("const");
+        EXPECT_EQ(file.path().filename(), name + ".schema.json");
+        commands.push_back(name.substr(5));
+    }
+    EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "diff", "dump", "extract", "grep", "info",
+                                                        "redact", "repair", "salvage", "stamp", "verify"));
+}
+
+TEST_F(Schema, RefusesWhatIsNotInIt) {
+    json document = json::parse(outputOf({"info", movie()}));
+    document["files"][0]["surprise"] = 1;
+    writeFile(folder / "document.json", document.dump());
+    EXPECT_EQ(
+        runProgram("/usr/bin/python3", {"-m", "jsonschema", schemaOf("info"), "-i", folder / "document.json"}).exitCode,
+        1);
+}
+
+TEST_F(Schema, HoldsForInfo) {
+    expectValid({outputOf({"info", movie(), odd(), torn()}), outputOf({"info", written("na\xff.dat", locations())})});
+}
+
+TEST_F(Schema, HoldsForAtoms) {
+    expectValid({outputOf({"atoms", movie(), odd(), interrupted(), written("a.wav", waveWithLocations())})});
+}
+
+TEST_F(Schema, HoldsForDump) {
+    const std::string strange = written("strange.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1e300, "\xff"));
+    std::vector<std::string> documents;
+    for (const std::string& file : {movie(), odd(), strange, torn()})
+        documents.push_back(
+            runTool({"dump", "--format", "json", "--images", folder / "images", "--force", file}).output);
+    expectValid(documents);
+}
+
+TEST_F(Schema, HoldsForVerify) {
+    expectValid({outputOf({"verify", movie(), odd(), torn(), interrupted()})});
+}
+
+TEST_F(Schema, HoldsForRepair) {
+    expectValid({outputOf({"repair", "--dry-run", movie()}), outputOf({"repair", "--dry-run", interrupted()}),
+                 outputOf({"repair", interrupted(), "-o", folder / "repaired.mp4"}),
+                 outputOf({"repair", "--dry-run", written("long.mp4", be32(100) + "mdat")})});
+}
+
+TEST_F(Schema, HoldsForDiff) {
+    const std::string other = written("other.dat", streamHeader("2b7b6af2", 1, 16) + pointEntry(0.5, 11, -20));
+    const std::string unknown = written("a.dat", streamHeader("2b7b6aff", 1, 12) + f64(1) + le32(2));
+    const std::string otherUnknown = written("b.dat", streamHeader("2b7b6aff", 2, 12) + f64(1) + le32(3));
+    expectValid({outputOf({"diff", movie(), movie()}), outputOf({"diff", movie(), odd()}),
+                 outputOf({"diff", torn(), other}), outputOf({"diff", unknown, otherUnknown})});
+}
+
+TEST_F(Schema, HoldsForGrep) {
+    expectValid(
+        {outputOf({"grep", "e", movie(), streamFile("slideText")}), outputOf({"grep", "nowhere at all", movie()})});
+}
+
+TEST_F(Schema, HoldsForAttachAndStamp) {
+    const std::string tornNames = written("names.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "whole") +
+                                                           textEntry(2, "torn").substr(0, 9));
+    const std::string plain = written("plain.mp4", tinyMovie());
+    expectValid({outputOf({"attach", plain, torn(), tornNames, "-o", folder / "attached.mp4"}),
+                 outputOf({"attach", interrupted(), "--from", movie(), "-o", folder / "carried.mp4"})});
+    expectValid({outputOf({"stamp", plain, "--creator", "a", "--creator-version", "1", "-o", folder / "stamped.mp4"})});
+}
+
+TEST_F(Schema, HoldsForExtractAndSalvage) {
+    expectValid(
+        {outputOf({"extract", movie(), "-o", folder / "streams"}), outputOf({"extract", odd(), "-o", folder / "odd"})});
+    expectValid({outputOf({"salvage", movie(), "-o", folder / "salvaged"}),
+                 outputOf({"salvage", written("cut.mp4", contentsOf(movie()).substr(300)), "-o", folder / "cut"})});
+}
+
+TEST_F(Schema, HoldsForRedact) {
+    expectValid({outputOf({"redact", movie(), "-o", folder / "public.mp4", "--keys", "--titles", "README", "--range",
+                           "1:2", "--streams", "systemData"}),
+                 outputOf({"redact", torn(), "-o", folder / "public.dat", "--range", "1:"})});
+}
+
+TEST_F(Schema, HoldsForEveryGoldenOutput) {
+    std::size_t count = 0;
+    for (const auto& file : std::filesystem::recursive_directory_iterator(std::string(ZULM_TEST_DATA) + "/golden")) {
+        if (file.path().extension() != ".json")
+            continue;
+        SCOPED_TRACE(file.path());
+        expectValid({contentsOf(file.path())});
+        ++count;
+    }
+    EXPECT_GE(count, 5U);
+}
+
+} // namespace
+} // namespace ZULMetaData::Test
