@@ -41,7 +41,8 @@ std::vector<ManualOption> optionsOf(const CLI::App& app) {
     std::vector<ManualOption> options;
     for (const CLI::Option* option : app.get_options(isShown))
         options.push_back(manualOfOption(*option));
-    std::ranges::stable_partition(options, &ManualOption::isPositional);
+    std::stable_partition(options.begin(), options.end(),
+                          [](const ManualOption& option) { return option.isPositional; });
     return options;
 }
 
