@@ -75,7 +75,7 @@ std::string bashCases(const std::vector<ManualOption>& options, const std::strin
     return cases;
 }
 
-/// The characters that mean something inside a specification of _arguments.
+/// The characters that mean something in an option given to _arguments.
 std::string zshText(const std::string& text) {
     std::string escaped;
     for (const char c : text) {
