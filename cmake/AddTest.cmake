@@ -8,5 +8,8 @@ function(zulm_add_test path)
   target_link_libraries(${name} PRIVATE ZULMetaDataTestSupport)
   zulm_project_options(${name})
   target_precompile_headers(${name} REUSE_FROM ZULMetaDataTestSupport)
+  # Without these, ccache keeps nothing that was compiled with a precompiled header.
+  target_compile_options(${name} PRIVATE
+    $<$<CXX_COMPILER_ID:GNU>:-fpch-preprocess> "$<$<CXX_COMPILER_ID:Clang>:SHELL:-Xclang -fno-pch-timestamp>")
   gtest_discover_tests(${name} TEST_PREFIX "${name}/" DISCOVERY_MODE PRE_TEST PROPERTIES TIMEOUT 300)
 endfunction()

@@ -45,7 +45,8 @@ TEST_F(SalvageCommand, GivesEveryStreamBehindABrokenAtom) {
     const ToolResult result = runTool({"salvage", file, "-o", folder / "out", "--json"});
     EXPECT_EQ(result.exitCode, 3);
     expectAllStreams();
-    for (const Json& stream : reportOf(result)["streams"])
+    const Json report = reportOf(result);
+    for (const Json& stream : report["streams"])
         EXPECT_EQ(stream["found"], "behind a broken atom");
 }
 
