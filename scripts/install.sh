@@ -7,6 +7,7 @@ build=(g++ cmake ninja-build ccache libpng-dev libtiff-dev libcli11-dev nlohmann
 media=(ffmpeg)
 test=(libgtest-dev libgmock-dev imagemagick pngcheck libimage-exiftool-perl mediainfo groff-base python3-jsonschema zsh fish)
 check=(clang clang-format git)
+reliability=(python3 valgrind strace)
 
 packages=()
 for group in "$@"; do

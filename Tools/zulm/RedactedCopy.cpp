@@ -8,6 +8,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <limits>
@@ -21,9 +22,9 @@ namespace {
 constexpr std::size_t s_pieceSize = 1 << 20;
 constexpr std::uint64_t s_most32 = std::numeric_limits<std::uint32_t>::max();
 
+/// Of at least one byte. The bytes are compared with themselves, one further on.
 bool isZero(const std::vector<char>& bytes, std::size_t size) {
-    return std::all_of(bytes.begin(), bytes.begin() + static_cast<std::ptrdiff_t>(size),
-                       [](char byte) { return byte == 0; });
+    return bytes.front() == 0 && std::memcmp(bytes.data(), bytes.data() + 1, size - 1) == 0;
 }
 
 /// Appends a part of a file. What is zero is skipped, so that holes stay holes.

@@ -1,0 +1,95 @@
+"""Runs the checks of this folder and prints one table. Started by scripts/reliability.sh, which builds first."""
+
+import argparse
+import concurrent.futures
+import importlib
+import pathlib
+import sys
+import tempfile
+import time
+import traceback
+
+from check import Context, Result
+
+SOURCE = pathlib.Path(__file__).resolve().parents[2]
+
+# Module in Checks/ and the name in the table, in the table's order.
+CHECKS = {
+    "kill_recorder": "recorder killed at random moments",
+    "kill_system_calls": "attach, repair and stamp killed at every system call",
+    "io_faults": "ENOSPC, EIO, EINTR and short transfers at every operation",
+    "full_disk": "a real full disk at every fill level",
+    "odd_files": "limits, permissions, FIFOs, devices, links and odd names",
+    "allocation_failures": "allocation failure at every allocation",
+    "truncations": "recordings cut at every byte",
+    "bit_flips": "every bit flipped",
+    "hostile_sizes": "hostile numbers in every size field",
+    "sparse_movies": "movies around and far above 4 GiB",
+    "fuzzing": "fuzzing of every input",
+    "differential": "atom walks against other programs",
+    "valgrind": "the test suite under valgrind",
+    "threads": "readers and writers on many threads",
+    "mutation": "mutants of the stream core killed by the tests",
+}
+FULL_ONLY = {"mutation"}
+DOCUMENT = SOURCE / "Docs/reliability.md"
+FENCES = ("<!-- table begins -->", "<!-- table ends -->")
+
+
+def execute(name, arguments):
+    started = time.monotonic()
+    with tempfile.TemporaryDirectory(prefix="zulm-reliability-") as folder:
+        context = Context(arguments.extent == "full", arguments.build, pathlib.Path(folder), SOURCE)
+        try:
+            result = importlib.import_module(f"Checks.{name}").run(context)
+        except Exception:  # a check that breaks is a check that fails; the others go on
+            result = Result(failures=[traceback.format_exc()])
+    return name, result, time.monotonic() - started
+
+
+def table(outcomes):
+    lines = ["| test | cases | lost | crashed | time |", "|---|---:|---:|---:|---:|"]
+    for name, result, seconds in outcomes:
+        holds = "" if result.holds() else " **fails**"
+        lines.append(f"| {CHECKS[name]}{holds} | {result.cases:,} | {result.lost:,} | {result.crashed:,} "
+                     f"| {seconds:.0f} s |")
+    return "\n".join(lines)
+
+
+def document(text):
+    page = DOCUMENT.read_text(encoding="utf-8")
+    before, _, rest = page.partition(FENCES[0])
+    _, _, after = rest.partition(FENCES[1])
+    DOCUMENT.write_text(f"{before}{FENCES[0]}\n{text}\n{FENCES[1]}{after}", encoding="utf-8")
+
+
+def main():
+    parser = argparse.ArgumentParser(description=__doc__)
+    parser.add_argument("extent", nargs="?", choices=("quick", "full"), default="quick")
+    parser.add_argument("only", nargs="*", help="run these checks alone: " + ", ".join(CHECKS))
+    parser.add_argument("--build", type=lambda path: pathlib.Path(path).resolve(), required=True)
+    parser.add_argument("--document", action="store_true", help="put the table into Docs/reliability.md")
+    arguments = parser.parse_args()
+    if unknown := set(arguments.only) - set(CHECKS):
+        parser.error("no check is called " + ", ".join(sorted(unknown)))
+
+    names = arguments.only or [name for name in CHECKS if arguments.extent == "full" or name not in FULL_ONLY]
+    outcomes = {}
+    with concurrent.futures.ProcessPoolExecutor(max_workers=2) as pool:
+        for done in concurrent.futures.as_completed([pool.submit(execute, name, arguments) for name in names]):
+            name, result, seconds = done.result()
+            outcomes[name] = (name, result, seconds)
+            print(f"{name}: {'holds' if result.holds() else 'FAILS'} ({result.cases} cases, {seconds:.0f} s)",
+                  file=sys.stderr, flush=True)
+            for failure in result.failures[:20]:
+                print(f"    {failure}", file=sys.stderr)
+
+    text = table([outcomes[name] for name in names])
+    print(text)
+    if arguments.document:
+        document(text)
+    return 0 if all(result.holds() for _, result, _ in outcomes.values()) else 1
+
+
+if __name__ == "__main__":
+    sys.exit(main())

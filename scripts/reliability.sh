@@ -1,0 +1,13 @@
+#!/usr/bin/env bash
+# Proves that nothing recorded is lost and nothing that is opened does harm: runs every check of Tests/Reliability and
+# prints one table. Usage: scripts/reliability.sh [quick|full] [CHECK...] [--document]
+# quick takes minutes, full up to an hour; --document puts the table into Docs/reliability.md.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+
+scripts/install.sh build media test check reliability
+echo "== building" >&2
+cmake --preset release -DZULMETADATA_BUILD_TESTS=ON >/dev/null
+cmake --build --preset release --target zulm reliability_programs >&2
+
+python3 Tests/Reliability/run.py --build build/release "$@"
