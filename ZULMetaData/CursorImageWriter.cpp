@@ -41,7 +41,7 @@ void CursorImageWriter::writeSteps(std::ostream& stream, CursorImageSchema::Step
 
 void CursorImageReader::Read(std::istream& stream, const FieldInfo& field) {
     if (field.size != 0)
-        stream.read(reinterpret_cast<char*>(field.data), field.size);
+        detail::readBytes(stream, reinterpret_cast<char*>(field.data), field.size);
     if (bytesLeft_ >= field.size)
         bytesLeft_ -= field.size;
 }

@@ -37,9 +37,18 @@ public:
     static std::size_t available(const std::streambuf& buffer) {
         return static_cast<std::size_t>((buffer.*&StreamBufferAccess::egptr)() - (buffer.*&StreamBufferAccess::gptr)());
     }
+    /// Read already, and still there.
+    static std::size_t passed(const std::streambuf& buffer) {
+        return static_cast<std::size_t>((buffer.*&StreamBufferAccess::gptr)() - (buffer.*&StreamBufferAccess::eback)());
+    }
     static const char* getPosition(const std::streambuf& buffer) { return (buffer.*&StreamBufferAccess::gptr)(); }
     static void advanceGet(std::streambuf& buffer, std::size_t count) {
-        (buffer.*&StreamBufferAccess::gbump)(static_cast<int>(count));
+        moveGet(buffer, static_cast<std::ptrdiff_t>(count));
+    }
+
+    /// By no more than is available or passed.
+    static void moveGet(std::streambuf& buffer, std::ptrdiff_t distance) {
+        (buffer.*&StreamBufferAccess::gbump)(static_cast<int>(distance));
     }
 };
 
@@ -61,6 +70,25 @@ inline void writeBytes(std::ostream& stream, const char* bytes, std::size_t size
     } else {
         writeAcrossBlocks(stream, bytes, size);
     }
+}
+
+/// As `stream.read`, at the cost of a copy where the get area holds the bytes. Gives how many have been read.
+inline std::size_t readBytes(std::istream& stream, char* bytes, std::size_t size) {
+    if (stream.good() && StreamBufferAccess::available(*stream.rdbuf()) >= size) {
+        std::memcpy(bytes, StreamBufferAccess::getPosition(*stream.rdbuf()), size);
+        StreamBufferAccess::advanceGet(*stream.rdbuf(), size);
+        return size;
+    }
+    stream.read(bytes, static_cast<std::streamsize>(size));
+    return static_cast<std::size_t>(stream.gcount());
+}
+
+/// Whether the end of the input comes next. As `stream.peek()`, which then sets the state, but without its cost where
+/// the get area holds another byte.
+inline bool isAtEnd(std::istream& stream) {
+    if (stream.good() && StreamBufferAccess::available(*stream.rdbuf()) > 0)
+        return false;
+    return stream.peek() == std::istream::traits_type::eof();
 }
 
 } // namespace ZULMetaData::detail

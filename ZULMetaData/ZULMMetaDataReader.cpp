@@ -24,14 +24,19 @@ bool readSupportedHeader(std::istream& stream, std::uint64_t start, int version,
 
 namespace {
 
-/// Appends `count` characters in pieces, so that no more memory is asked for than the input can fill until it
-/// turns out to be shorter.
+/// Appends `count` characters: at once where the get area holds them, else in pieces, so that no more memory is asked
+/// for than the input can fill until it turns out to be shorter.
 void appendCharacters(std::istream& stream, std::uint32_t count, std::string& text) {
+    if (stream.good() && StreamBufferAccess::available(*stream.rdbuf()) >= count) {
+        text.append(StreamBufferAccess::getPosition(*stream.rdbuf()), count);
+        StreamBufferAccess::advanceGet(*stream.rdbuf(), count);
+        return;
+    }
     std::array<char, 4096> piece;
     char last = '\0';
     while (count > 0) {
-        stream.read(piece.data(), std::min<std::streamsize>(count, piece.size()));
-        const auto size = static_cast<std::uint32_t>(stream.gcount());
+        const std::size_t wanted = std::min<std::size_t>(count, piece.size());
+        const auto size = static_cast<std::uint32_t>(readBytes(stream, piece.data(), wanted));
         if (size == 0) {
             text.append(count, last);
             return;
@@ -46,9 +51,9 @@ void appendCharacters(std::istream& stream, std::uint32_t count, std::string& te
 
 std::uint64_t readStringEntry(std::istream& stream, double& time, std::string& text) {
     std::uint32_t size = 0; // of the time and the characters
-    stream.read(reinterpret_cast<char*>(&size), sizeof size);
+    readBytes(stream, reinterpret_cast<char*>(&size), sizeof size);
     throwIfInputEnded(stream);
-    stream.read(reinterpret_cast<char*>(&time), sizeof time);
+    readBytes(stream, reinterpret_cast<char*>(&time), sizeof time);
     const std::uint32_t count = size - static_cast<std::uint32_t>(sizeof time);
     appendCharacters(stream, count, text);
     return sizeof size + sizeof time + std::uint64_t{count};
@@ -57,9 +62,9 @@ std::uint64_t readStringEntry(std::istream& stream, double& time, std::string& t
 std::uint64_t readStringListEntry(std::istream& stream, std::list<std::string>& texts) {
     std::uint32_t total = 0; // counts what follows, and is not needed
     std::uint32_t count = 0;
-    stream.read(reinterpret_cast<char*>(&total), sizeof total);
+    readBytes(stream, reinterpret_cast<char*>(&total), sizeof total);
     throwIfInputEnded(stream);
-    stream.read(reinterpret_cast<char*>(&count), sizeof count);
+    readBytes(stream, reinterpret_cast<char*>(&count), sizeof count);
     std::uint64_t taken = sizeof total + sizeof count;
     for (; count > 0; --count) {
         double unusedTime = 0;

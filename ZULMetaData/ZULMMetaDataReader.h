@@ -72,8 +72,7 @@ std::uint64_t readStringListEntry(std::istream& stream, std::list<std::string>& 
 template <FixedSizeValue T>
 std::uint64_t readFixedEntry(std::istream& stream, double& time, T& value) {
     std::array<char, sizeof time + sizeof value> entry;
-    stream.read(entry.data(), entry.size());
-    const auto size = static_cast<std::size_t>(stream.gcount());
+    const std::size_t size = readBytes(stream, entry.data(), entry.size());
     if (size < sizeof time)
         throwIfInputEnded(stream);
     std::memcpy(&time, entry.data(), std::min(size, sizeof time));
@@ -101,6 +100,15 @@ bool readBufferedEntries(DataStreamObserver<T>& observer, std::istream& stream, 
             return false;
     }
     return true;
+}
+
+/// A text keeps its memory from entry to entry.
+template <StreamValue T>
+void renew(T& value) {
+    if constexpr (std::same_as<T, std::string>)
+        value.clear();
+    else
+        value = T{};
 }
 
 template <StreamValue T>
@@ -135,6 +143,7 @@ void MetaDataReader<T>::parseStream(DataStreamObserver<T>& observer, std::istrea
         return;
     const std::uint64_t end = start + length;
     std::uint64_t position = start + s_metaDataHeaderSize; // counted: asking a file stream is a system call
+    T value{};
     while (stream.good() && position < end) {
         if constexpr (FixedSizeValue<T>) {
             if (!detail::readBufferedEntries(observer, stream, position, end))
@@ -143,11 +152,11 @@ void MetaDataReader<T>::parseStream(DataStreamObserver<T>& observer, std::istrea
                 return;
         }
         double time = 0;
-        T value{};
+        detail::renew(value);
         const std::uint64_t taken = detail::readEntry(stream, time, value, header.version);
         if (!observer.dataRead(time, value))
             return;
-        if (taken == 0 || stream.peek() == std::istream::traits_type::eof())
+        if (taken == 0 || detail::isAtEnd(stream))
             return; // a version without fields would never come to an end
         position += taken;
     }

@@ -9,6 +9,8 @@
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <thread>
+#include <utility>
 #include <variant>
 #include <vector>
 
@@ -27,6 +29,9 @@ protected:
 
     const EntryKeys pointKeys{"x", "y"};
     const EntryDictionary point{pointKeys, {std::int32_t{1}, std::int32_t{2}}};
+
+    const EntryKeys locationKeys{"x", "timestamp"};
+    const EntryDictionary location = EntryDictionary::ofNumbers(locationKeys, {std::int32_t{-7}, 0.25F});
 };
 
 TEST_F(EntryDictionaries, GiveEveryValueByItsKey) {
@@ -105,6 +110,42 @@ TEST_F(EntryDictionaries, AreWalkedStepByStep) {
     EXPECT_EQ(++at, point.end());
     EXPECT_EQ(EntryDictionary::const_iterator(), EntryDictionary::const_iterator());
     EXPECT_NE(EntryDictionary::const_iterator(), point.begin());
+}
+
+TEST_F(EntryDictionaries, OfNumbersGiveThemInEveryWay) {
+    EXPECT_EQ(location.get<std::int32_t>("x"), -7);
+    EXPECT_EQ(location.get<float>("timestamp"), 0.25F);
+    EXPECT_THROW(location.get<float>("x"), std::bad_variant_access);
+    EXPECT_THROW(location.get<std::string>("timestamp"), std::bad_variant_access);
+    EXPECT_THROW(location.get<std::int32_t>("y"), std::out_of_range);
+    EXPECT_EQ(location.at("x"), EntryValue(std::int32_t{-7}));
+    EXPECT_EQ(location.find("timestamp")->second, EntryValue(0.25F));
+    EXPECT_EQ(location.get<std::int32_t>("x"), -7) << "again, now that there are values";
+    EXPECT_THROW(location.get<std::int64_t>("x"), std::bad_variant_access);
+}
+
+TEST_F(EntryDictionaries, OfNumbersGiveOneAndTheSameValueToAllWhoAsk) {
+    std::vector<const EntryValue*> given(8);
+    std::vector<std::thread> threads;
+    for (const EntryValue*& value : given)
+        threads.emplace_back([&] { value = &location.at("x"); });
+    for (std::thread& thread : threads)
+        thread.join();
+    EXPECT_THAT(given, testing::Each(&location.at("x")));
+}
+
+TEST_F(EntryDictionaries, OfNumbersAreCopiedAndMovedBeforeAndAfterTheyWereAskedFor) {
+    for (int asked = 0; asked < 2; ++asked) {
+        EntryDictionary copy = location;
+        EntryDictionary moved = std::move(copy);
+        EntryDictionary assigned = point;
+        assigned = moved;
+        moved = EntryDictionary(point);
+        EXPECT_EQ(assigned.at("x"), EntryValue(std::int32_t{-7}));
+        EXPECT_EQ(assigned.get<float>("timestamp"), 0.25F);
+        EXPECT_EQ(moved.at("y"), EntryValue(std::int32_t{2}));
+        EXPECT_EQ(location.at("timestamp"), EntryValue(0.25F));
+    }
 }
 
 TEST_F(EntryDictionaries, AreCopiedWithTheirValues) {

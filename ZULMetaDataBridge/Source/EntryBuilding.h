@@ -5,11 +5,12 @@
 #include "ZULMetaDataBridge/Source/EntryDictionary.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
 
-#include <array>
+#include <concepts>
 #include <cstdint>
 #include <functional>
 #include <string>
 #include <tuple>
+#include <type_traits>
 
 namespace ZULMetaData {
 
@@ -35,6 +36,20 @@ inline EntryValue entryValue(EntryValue value) {
     return value;
 }
 
+/// A field whose value is a number of 32 bits, or becomes one.
+template <class Value>
+concept NumberField = OneOf < std::remove_cvref_t<Value>,
+        std::int32_t, std::uint32_t,
+float, double > ;
+
+template <NumberField Value>
+EntryNumber entryNumber(Value value) {
+    if constexpr (std::integral<Value>)
+        return static_cast<std::int32_t>(value);
+    else
+        return static_cast<float>(value);
+}
+
 /// The keys of a kind's fields, then "timestamp".
 template <class Kind>
 const EntryKeys& entryKeys() {
@@ -50,11 +65,15 @@ const EntryKeys& entryKeys() {
 template <class Kind>
 EntryDictionary makeEntry(double time, const typename Kind::Value& value) {
     static_assert(std::tuple_size_v<decltype(Kind::fields)> < EntryDictionary::maxSize);
-    const auto values = [&](const auto&... field) {
-        return std::array<EntryValue, EntryDictionary::maxSize>{entryValue(std::invoke(field.valueOf, value))...,
-                                                                entryValue(time)};
+    const auto build = [&](const auto&... field) -> EntryDictionary {
+        const EntryKeys& keys = entryKeys<Kind>();
+        if constexpr ((NumberField<decltype(std::invoke(field.valueOf, value))> && ...))
+            return EntryDictionary::ofNumbers(keys,
+                                              {entryNumber(std::invoke(field.valueOf, value))..., entryNumber(time)});
+        else
+            return {keys, {entryValue(std::invoke(field.valueOf, value))..., entryValue(time)}};
     };
-    return {entryKeys<Kind>(), std::apply(values, Kind::fields)};
+    return std::apply(build, Kind::fields);
 }
 
 } // namespace ZULMetaData

@@ -5,11 +5,28 @@
 
 namespace ZULMetaData {
 
+namespace {
+
+EntryValue valueOf(const EntryNumber& number) {
+    return std::visit([](auto value) { return EntryValue(value); }, number);
+}
+
+} // namespace
+
+EntryDictionary::EntryDictionary(const EntryDictionary& other) : keys_(other.keys_), numbers_(other.numbers_) {
+    if (const Values* values = other.values_.load(std::memory_order_acquire))
+        values_ = new Values(*values);
+}
+
+EntryDictionary& EntryDictionary::operator=(EntryDictionary other) noexcept {
+    keys_ = other.keys_;
+    numbers_ = other.numbers_;
+    other.values_ = values_.exchange(other.values_);
+    return *this;
+}
+
 const EntryValue& EntryDictionary::at(std::string_view key) const {
-    const const_iterator found = find(key);
-    if (found == end())
-        throw std::out_of_range("no value for key " + std::string(key));
-    return (*found).second;
+    return values()[indexOf(key)];
 }
 
 EntryDictionary::const_iterator EntryDictionary::find(std::string_view key) const {
@@ -27,6 +44,25 @@ EntryDictionary::const_iterator EntryDictionary::begin() const {
 
 EntryDictionary::const_iterator EntryDictionary::end() const {
     return {*this, size()};
+}
+
+std::size_t EntryDictionary::indexOf(std::string_view key) const {
+    const auto found = std::find(keys_->begin(), keys_->end(), key);
+    if (found == keys_->end())
+        throw std::out_of_range("no value for key " + std::string(key));
+    return static_cast<std::size_t>(found - keys_->begin());
+}
+
+/// Where two threads make them at once, the first to be done has made the entry's own.
+const EntryDictionary::Values& EntryDictionary::values() const {
+    const Values* values = values_.load(std::memory_order_acquire);
+    if (values)
+        return *values;
+    auto made = std::make_unique<Values>();
+    std::transform(numbers_.begin(), numbers_.end(), made->begin(), valueOf);
+    if (values_.compare_exchange_strong(values, made.get(), std::memory_order_acq_rel))
+        values = made.release();
+    return *values;
 }
 
 } // namespace ZULMetaData

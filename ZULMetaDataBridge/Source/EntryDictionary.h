@@ -6,11 +6,12 @@
 //         std::cout << entry.get<std::int32_t>("x") << " at " << entry.get<float>("timestamp") << '\n';
 
 #include <array>
+#include <atomic>
+#include <concepts>
 #include <cstddef>
 #include <cstdint>
 #include <iterator>
 #include <memory>
-#include <span>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -23,28 +24,49 @@ class Image;
 
 using EntryValue = std::variant<std::int32_t, std::int64_t, float, std::string, std::shared_ptr<const Image>>;
 
+/// What most kinds of entry consist of. A fifth of the size of an `EntryValue`.
+using EntryNumber = std::variant<std::int32_t, float>;
+
 /// The keys of one kind of entry, in the order of its values.
 using EntryKeys = std::vector<std::string>;
 
-/// One decoded entry: a small map whose order is that of its kind's keys.
+/// One decoded entry: a small map whose order is that of its kind's keys. Constant entries may be read by several
+/// threads.
+///
+/// Hours of recording make millions of entries, nearly all of them numbers: those are kept inline, 56 bytes in all, and
+/// become `EntryValue`s only where somebody asks for one.
 class EntryDictionary {
 public:
     static constexpr std::size_t maxSize = 5;
+    using Values = std::array<EntryValue, maxSize>;
+    using Numbers = std::array<EntryNumber, maxSize>;
     using value_type = std::pair<const std::string&, const EntryValue&>;
     class const_iterator;
 
     /// `keys` must outlive the entry; `values` are its values in the same order, at most `maxSize`.
-    EntryDictionary(const EntryKeys& keys, std::array<EntryValue, maxSize> values)
-        : keys_(&keys), values_(std::move(values)) {}
+    EntryDictionary(const EntryKeys& keys, Values values) : keys_(&keys), values_(new Values(std::move(values))) {}
 
-    /// Throws `std::out_of_range` for a key that the entry lacks.
+    /// The same for an entry of numbers alone; allocates nothing.
+    static EntryDictionary ofNumbers(const EntryKeys& keys, const Numbers& numbers) noexcept {
+        EntryDictionary entry(keys);
+        entry.numbers_ = numbers;
+        return entry;
+    }
+
+    EntryDictionary(const EntryDictionary& other);
+    EntryDictionary(EntryDictionary&& other) noexcept
+        : keys_(other.keys_), numbers_(other.numbers_), values_(other.values_.load(std::memory_order_relaxed)) {
+        other.values_.store(nullptr, std::memory_order_relaxed);
+    }
+    EntryDictionary& operator=(EntryDictionary other) noexcept;
+    ~EntryDictionary() { delete values_.load(std::memory_order_relaxed); }
+
+    /// Throws `std::out_of_range` for a key that the entry lacks. Valid as long as the entry.
     const EntryValue& at(std::string_view key) const;
 
     /// Throws as `at` does, and `std::bad_variant_access` where the value is of another type.
     template <class T>
-    T get(std::string_view key) const {
-        return std::get<T>(at(key));
-    }
+    T get(std::string_view key) const;
 
     const_iterator find(std::string_view key) const;
     bool contains(std::string_view key) const;
@@ -53,8 +75,14 @@ public:
     const_iterator end() const;
 
 private:
+    explicit EntryDictionary(const EntryKeys& keys) noexcept : keys_(&keys) {}
+
+    std::size_t indexOf(std::string_view key) const;
+    const Values& values() const;
+
     const EntryKeys* keys_;
-    std::array<EntryValue, maxSize> values_;
+    Numbers numbers_{};                                   // where there are no values
+    mutable std::atomic<const Values*> values_ = nullptr; // owned
 };
 
 using EntryList = std::vector<EntryDictionary>;
@@ -75,7 +103,7 @@ public:
     const_iterator() = default;
     const_iterator(const EntryDictionary& entry, std::size_t index) : entry_(&entry), index_(index) {}
 
-    reference operator*() const { return {(*entry_->keys_)[index_], entry_->values_[index_]}; }
+    reference operator*() const { return {(*entry_->keys_)[index_], entry_->values()[index_]}; }
     pointer operator->() const { return {**this}; }
     const_iterator& operator++() {
         ++index_;
@@ -88,5 +116,13 @@ private:
     const EntryDictionary* entry_ = nullptr;
     std::size_t index_ = 0;
 };
+
+template <class T>
+T EntryDictionary::get(std::string_view key) const {
+    if constexpr (std::same_as<T, std::int32_t> || std::same_as<T, float>)
+        if (!values_.load(std::memory_order_acquire))
+            return std::get<T>(numbers_[indexOf(key)]);
+    return std::get<T>(at(key));
+}
 
 } // namespace ZULMetaData
