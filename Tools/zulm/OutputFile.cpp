@@ -52,6 +52,8 @@ OutputFile::OutputFile(const std::string& path, const std::vector<std::string>& 
     for (const std::string& input : inputs)
         if (isSameFile(path, input))
             throw Failure(fmt::format("{}: is the input {} itself; choose another output", path, input));
+    if (fs::exists(path) && !fs::is_regular_file(path))
+        throw Failure(fmt::format("{}: not a regular file; choose another output", path));
     if (fs::exists(path) && !force)
         throw Failure(fmt::format("{}: exists already; --force replaces it", path));
     temporary_ = newTemporary(path);

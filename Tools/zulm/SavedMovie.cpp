@@ -84,17 +84,20 @@ void requireDestination(const SaveOptions& options) {
 }
 
 SavedMovie::SavedMovie(const SaveOptions& options, const std::vector<std::string>& otherInputs)
-    : name_(options.inPlace ? options.movie : options.output), subject_(name_), path_(name_) {
+    : name_(options.inPlace ? options.movie : options.output), subject_(options.movie), path_(options.movie) {
     requireMovie(options.movie);
     requireMovieName(name_);
     if (options.inPlace)
         requireFile(options.movie, true);
     requireRepairable(options.movie);
     std::signal(SIGXFSZ, SIG_IGN); // a file that may not grow is a write that fails, and is undone
-    if (options.inPlace)
+    if (options.inPlace) {
         catchSignals();
-    else
-        copy(options, otherInputs);
+        return;
+    }
+    std::vector<std::string> inputs = otherInputs;
+    inputs.push_back(options.movie);
+    copy_ = std::make_unique<OutputFile>(options.output, inputs, options.force);
 }
 
 SavedMovie::~SavedMovie() {
@@ -113,12 +116,12 @@ SafeMovieSave::Progress SavedMovie::progress(const std::string& what) const {
     };
 }
 
-void SavedMovie::copy(const SaveOptions& options, std::vector<std::string> inputs) {
-    inputs.push_back(options.movie);
-    copy_ = std::make_unique<OutputFile>(options.output, inputs, options.force);
-    copy_->copyFrom(options.movie);
+void SavedMovie::makeCopy() {
+    if (!copy_)
+        return;
+    copy_->copyFrom(path_);
+    subject_ = fmt::format("{}, a copy of {}", name_, path_);
     path_ = copy_->temporaryPath();
-    subject_ = fmt::format("{}, a copy of {}", options.output, options.movie);
 }
 
 void SavedMovie::commit() {

@@ -29,8 +29,8 @@ void addSaveOptions(CLI::App& command, SaveOptions& options);
 /// Throws the usage error where it is left open which file is written.
 void requireDestination(const SaveOptions& options);
 
-/// The movie that a command works on: a copy that takes its place when it is committed, or the movie itself. While
-/// the movie itself is changed, a signal undoes that before it ends the program.
+/// The movie that a command works on: a copy that is put in its place when all is done, or the movie itself. While the
+/// movie itself is changed, a signal undoes that before it ends the program.
 class SavedMovie {
 public:
     /// Throws `Failure` for what is no movie or cannot be repaired, and where the output is one of the inputs.
@@ -42,10 +42,22 @@ public:
     /// The file that the result is in.
     const std::string& name() const { return name_; }
 
-    /// Gives what `work` makes of the movie's `SafeMovieSave`, and puts the copy in place. Throws `Failure`.
+    /// Lets `look` see the movie as it is, before anything is copied. Throws `Failure`.
+    template <class Look>
+    void examine(Look look) const {
+        try {
+            look(ZULMetaData::SafeMovieSave(path_));
+        } catch (const ZULMetaData::SaveError& error) {
+            fail(error);
+        }
+    }
+
+    /// Gives what `work` makes of the `SafeMovieSave` of the movie or its copy, and puts the copy in place. Throws
+    /// `Failure`. Once only.
     template <class Work>
     auto save(const std::string& what, Work work) {
         try {
+            makeCopy();
             const auto result = work(ZULMetaData::SafeMovieSave(path_, progress(what)));
             commit();
             return result;
@@ -62,14 +74,14 @@ private:
     };
 
     ZULMetaData::SafeMovieSave::Progress progress(const std::string& what) const;
-    void copy(const SaveOptions& options, std::vector<std::string> inputs);
+    void makeCopy();
     void commit();
     [[noreturn]] void fail(const ZULMetaData::SaveError& error) const;
     [[noreturn]] void endBy(const Interruption& interruption) const;
 
     std::string name_;
     std::string subject_; ///< what messages call it
-    std::string path_;    ///< of what is written to
+    std::string path_;    ///< of the movie, then of what is written to
     std::unique_ptr<OutputFile> copy_;
 };
 

@@ -61,7 +61,9 @@ Candidate examine(const StreamSource& source) {
     return candidate;
 }
 
-std::vector<Candidate> examine(const std::vector<StreamSource>& sources) {
+std::vector<Candidate> examine(const FileLocation& movie, const std::vector<StreamSource>& sources) {
+    if (sources.empty())
+        throw SaveError(utf8Path(movie), "there are no streams to attach");
     std::vector<Candidate> candidates;
     for (const StreamSource& source : sources) {
         try {
@@ -70,12 +72,24 @@ std::vector<Candidate> examine(const std::vector<StreamSource>& sources) {
             throw SaveError(source.name(), error.what());
         }
         const auto& added = candidates.back().stream;
-        const auto first = std::ranges::find(candidates, added.type, [](const auto& c) { return c.stream.type; });
+        const auto first = std::find_if(candidates.begin(), candidates.end(),
+                                        [&](const auto& candidate) { return candidate.stream.type == added.type; });
         if (&first->stream != &added)
             throw SaveError(added.name,
                             "a second stream of the kind " + kindText(added.type) + ", beside " + first->stream.name);
     }
     return candidates;
+}
+
+void refuseExisting(const FileLocation& path, const std::vector<Candidate>& candidates) {
+    std::ifstream movie = openMovie(path);
+    const auto parser = parserOver(movie);
+    for (const Candidate& candidate : candidates)
+        if (const auto range = parser->fileDataForUUID(candidate.stream.type); range.offset != 0)
+            throw SaveError(utf8Path(path),
+                            "has a stream of the kind " + kindText(candidate.stream.type) + " already, at offset " +
+                                std::to_string(range.offset),
+                            SaveError::Reason::KindExists);
 }
 
 /// One save of one movie, from its repair to what is read back.
@@ -107,7 +121,6 @@ private:
         throw SaveError(utf8Path(movie_), sentence, reason);
     }
 
-    void refuseExisting(const std::vector<Candidate>& candidates) const;
     void write(Candidate& candidate);
     void verify(const std::vector<Candidate>& candidates);
     void compare(std::ifstream& movie, const Candidate& candidate);
@@ -131,16 +144,6 @@ RepairPlan Save::repair() {
         fail(plan.finding);
     transaction_.apply(plan.changes);
     return plan;
-}
-
-void Save::refuseExisting(const std::vector<Candidate>& candidates) const {
-    std::ifstream movie = openMovie(movie_);
-    const auto parser = parserOver(movie);
-    for (const Candidate& candidate : candidates)
-        if (const auto range = parser->fileDataForUUID(candidate.stream.type); range.offset != 0)
-            fail("has a stream of the kind " + kindText(candidate.stream.type) + " already, at offset " +
-                     std::to_string(range.offset),
-                 SaveError::Reason::KindExists);
 }
 
 void Save::advance(std::uint64_t bytes) {
@@ -202,7 +205,7 @@ void Save::verify(const std::vector<Candidate>& candidates) {
 AttachResult Save::attach(std::vector<Candidate>& candidates, SafeMovieSave::Existing existing) {
     AttachResult result{repair(), {}};
     if (existing == SafeMovieSave::Existing::Refuse)
-        refuseExisting(candidates);
+        refuseExisting(movie_, candidates);
     for (const Candidate& candidate : candidates)
         total_ += 2 * candidate.stream.bytes; // written, and read back
     transaction_.beginAtom(detail::s_metaDataAtom);
@@ -261,10 +264,14 @@ RepairPlan SafeMovieSave::repair() const {
 }
 
 AttachResult SafeMovieSave::attach(const std::vector<StreamSource>& streams, Existing existing) const {
-    if (streams.empty())
-        throw SaveError(utf8Path(movie_), "there are no streams to attach");
-    std::vector<Candidate> candidates = examine(streams);
+    std::vector<Candidate> candidates = examine(movie_, streams);
     return save(movie_, progress_, [&](Save& work) { return work.attach(candidates, existing); });
+}
+
+void SafeMovieSave::checkAttach(const std::vector<StreamSource>& streams, Existing existing) const {
+    const std::vector<Candidate> candidates = examine(movie_, streams);
+    if (existing == Existing::Refuse)
+        refuseExisting(movie_, candidates);
 }
 
 StampResult SafeMovieSave::stamp(const std::string& creatorName, const std::string& creatorVersion) const {

@@ -92,6 +92,9 @@ public:
     /// Throws for a stream without a header, for two of one kind, for none at all, and see `Existing`.
     AttachResult attach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse) const;
 
+    /// Throws what `attach` would for these streams, and changes nothing. For those who copy the movie first.
+    void checkAttach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse) const;
+
     /// Appends what `ZULRAtomWriter::writeZULRtoFile` does. It never ends the process.
     StampResult stamp(const std::string& creatorName, const std::string& creatorVersion) const;
 
