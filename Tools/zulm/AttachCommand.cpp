@@ -37,8 +37,10 @@ uuid typeOfStreamFile(const std::string& path) {
     requireFile(path);
     if (MetaDataParser::streamTypeOf(path) == MetaDataParser::RawStream)
         return Recording(path).parser().getAvailableMetaDataUUIDs().front();
-    throw Failure(
-        fmt::format("{}: not a stream file (.dat); '--from {}' carries the streams of a recording over", path, path));
+    std::string text = fmt::format("{}: not a stream file (.dat)", path);
+    if (MetaDataParser::streamTypeOf(path) != MetaDataParser::Unknown)
+        text += fmt::format("; '--from {}' carries the streams of a recording over", path);
+    throw Failure(text);
 }
 
 void takeStreamFiles(const AttachOptions& options, Streams& streams) {
@@ -134,11 +136,10 @@ Json streamDocument(const AttachedStream& stream) {
 }
 
 void report(const AttachOptions& options, const std::string& name, const AttachResult& attached) {
-    Json file{{"path", options.save.movie},
-              {"output", name},
-              {"repair", repairDocument(attached.repair)},
-              {"streams", Json::array()}};
-    std::ranges::transform(attached.streams, std::back_inserter(file["streams"]), streamDocument);
+    Json file = fileHeader(options.save.movie);
+    file.update(Json{{"output", name}, {"repair", repairDocument(attached.repair)}, {"streams", Json::array()}});
+    for (const auto& stream : attached.streams)
+        file["streams"].push_back(streamDocument(stream));
     printReport("attach", Json::array({file}));
 }
 
@@ -169,6 +170,7 @@ ExitCode runAttach(const AttachOptions& options) {
         inputs.push_back(options.from);
     SavedMovie movie(options.save, inputs);
     const auto existing = options.replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse;
+    movie.examine([&](const SafeMovieSave& save) { save.checkAttach(streams.sources, existing); });
     const AttachResult attached = movie.save("attaching to " + movie.name(), [&](const SafeMovieSave& save) {
         return save.attach(streams.sources, existing);
     });

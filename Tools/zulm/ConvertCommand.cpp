@@ -125,7 +125,7 @@ ExitCode runConvert(const ConvertOptions& options) {
     const double duration = movieDuration(recording.parser()).value_or(0);
     const std::string text =
         formatted(placed(reader.captions(), unitsPerSecond(options.format), duration), options.format);
-    if (options.output.empty())
+    if (options.output.empty() || options.output == "-")
         writeOutput(text);
     else
         writeWholeFile(options.output, text, {input.path()}, options.force);
@@ -146,8 +146,8 @@ bool hasWords(const std::string& kind) {
 void addConvertCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<ConvertOptions>();
     CLI::App* command = app.add_subcommand(
-        "convert", "Write keystrokes as captions (srt, vtt, ass), or titles as chapters (ffmetadata, chapters). What "
-                   "was typed shows as bullets");
+        "convert", "Write keystrokes as captions or titles as chapters. Captions are srt, vtt or ass, chapters "
+                   "ffmetadata or chapters; what was typed shows as bullets");
     command->add_option("FILE", options->file, "A movie, RIFF file or stream file; - is standard input")->required();
     addChoice(*command, "--to", options->format, "What to write",
               {{"srt", CaptionFormat::SRT},
@@ -156,7 +156,7 @@ void addConvertCommand(CLI::App& app, Action& chosen) {
                {"ffmetadata", CaptionFormat::FFMetaData},
                {"chapters", CaptionFormat::Chapters}})
         ->required();
-    command->add_option("-o,--output", options->output, "Write to this file instead of standard output")
+    command->add_option("-o,--output", options->output, "Write to this file; - is standard output, as without it")
         ->type_name("OUT");
     addStreamOption(*command, options->kinds,
                     "What to write: keyboardAction, or a kind of texts (repeatable). Without it, keyboardAction as "

@@ -304,7 +304,7 @@ void addDiffCommand(CLI::App& app, Action& chosen) {
         "diff", "Show which streams and entries differ: - only in A, + only in B, < and > what A and B have at one "
                 "time. Ends with 0 where nothing does, with 3 where something does");
     command->add_option("A", options->left, "A movie, RIFF file or stream file; - is standard input")->required();
-    command->add_option("B", options->right, "What to compare it with")->required();
+    command->add_option("B", options->right, "What to compare it with, likewise")->required();
     addStreamOption(*command, options->kinds, "Only this kind, such as cursorLocation, or UUID (repeatable)");
     command->add_option("--limit", options->limit, "List at most this many differences of each stream, 0 for all")
         ->type_name("N")
@@ -312,7 +312,11 @@ void addDiffCommand(CLI::App& app, Action& chosen) {
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm diff Original.mp4 Edited.mp4\n"
                     "zulm diff --stream keyboardAction --limit 0 Original.mp4 Edited.mp4");
-    command->callback([options, &chosen] { chosen = [options] { return runDiff(*options); }; });
+    command->callback([options, &chosen] {
+        if (options->left == "-" && options->right == "-")
+            throw CLI::ValidationError("only one of A and B can be standard input");
+        chosen = [options] { return runDiff(*options); };
+    });
 }
 
 } // namespace Zulm

@@ -1,6 +1,7 @@
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/EntryFormat.h"
+#include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
@@ -224,12 +225,12 @@ std::vector<uuid> chosenTypes(const Recording& recording, const std::vector<uuid
         return available;
     std::vector<uuid> types;
     for (const std::string& name : options.kinds) {
-        const auto kind = std::ranges::find(s_metaDataKinds, name, &MetaDataKind::name);
-        if (std::ranges::find(available, kind->type) == available.end())
+        const uuid type = typeNamed(name);
+        if (std::find(available.begin(), available.end(), type) == available.end())
             throw Failure(fmt::format("{}: has no stream {}; 'zulm info {}' lists what it has", recording.name(), name,
                                       recording.name()));
-        if (std::ranges::find(types, kind->type) == types.end())
-            types.push_back(kind->type);
+        if (std::find(types.begin(), types.end(), type) == types.end())
+            types.push_back(type);
     }
     return types;
 }
@@ -247,18 +248,8 @@ ExitCode runDump(const DumpOptions& options) {
         worst = worseOf(worst, dumpStream(recording, options, printout, recording.streamInfo(type), types.size() == 1));
     printout.end();
     if (available.empty())
-        complain(fmt::format("{}: has no recording metadata", recording.name()));
+        complainAboutNothing(recording, {});
     return worst;
-}
-
-std::string checkKind(const std::string& name) {
-    std::vector<std::string> names;
-    for (const MetaDataKind& kind : s_metaDataKinds)
-        names.emplace_back(kind.name);
-    if (std::ranges::find(names, name) != names.end())
-        return {};
-    return fmt::format("no kind of stream is called {}{}\nthe kinds are {}", name, suggestionFor(name, names),
-                       fmt::join(names, ", "));
 }
 
 } // namespace
@@ -267,10 +258,7 @@ void addDumpCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<DumpOptions>();
     CLI::App* command = app.add_subcommand("dump", "Print the entries of a file's streams");
     command->add_option("FILE", options->file, "A movie, RIFF file or stream file; - is standard input")->required();
-    command->add_option("--stream", options->kinds, "Only this kind, such as cursorLocation (repeatable)")
-        ->type_name("KIND")
-        ->allow_extra_args(false)
-        ->check(CLI::Validator(checkKind, ""));
+    addStreamOption(*command, options->kinds, "Only this kind, such as cursorLocation, or UUID (repeatable)");
     addChoice(*command, "--format", options->format,
               "How entries are printed. csv has one table for every stream, an empty line between them",
               {{"text", EntryFormat::Text},

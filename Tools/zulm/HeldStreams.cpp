@@ -21,7 +21,8 @@ namespace {
 constexpr std::size_t s_pieceSize = 1 << 20;
 
 bool isChosen(const uuid& type, const std::vector<std::string>& kinds) {
-    return kinds.empty() || std::ranges::any_of(kinds, [&](const auto& kind) { return typeNamed(kind) == type; });
+    return kinds.empty() ||
+           std::any_of(kinds.begin(), kinds.end(), [&](const auto& kind) { return typeNamed(kind) == type; });
 }
 
 /// Whether the text is an identifier, in digits of either case.
@@ -35,7 +36,7 @@ std::string checkKind(const std::string& kind) {
     std::vector<std::string> names;
     for (const MetaDataKind& registered : s_metaDataKinds)
         names.emplace_back(registered.name);
-    if (isIdentifier(kind) || std::ranges::find(names, kind) != names.end())
+    if (isIdentifier(kind) || std::find(names.begin(), names.end(), kind) != names.end())
         return {};
     return fmt::format("no kind of stream is called {}{}\nthe kinds are {}", kind, suggestionFor(kind, names),
                        fmt::join(names, ", "));
@@ -74,7 +75,8 @@ CLI::Option* addStreamOption(CLI::App& command, std::vector<std::string>& kinds,
 }
 
 uuid typeNamed(const std::string& kind) {
-    const auto registered = std::ranges::find(s_metaDataKinds, kind, &MetaDataKind::name);
+    const auto registered = std::find_if(s_metaDataKinds.begin(), s_metaDataKinds.end(),
+                                         [&](const MetaDataKind& candidate) { return candidate.name == kind; });
     if (registered != s_metaDataKinds.end())
         return registered->type;
     uuid type{};
@@ -83,8 +85,13 @@ uuid typeNamed(const std::string& kind) {
 }
 
 ExitCode complainAboutNothing(const Recording& recording, const std::vector<std::string>& kinds) {
-    const std::string what = kinds.empty() ? "recording metadata" : fmt::format("stream {}", fmt::join(kinds, " or "));
-    complain(fmt::format("{}: has no {}; 'zulm info {}' lists what it has", recording.name(), what, recording.name()));
+    const std::string& name = recording.name();
+    if (kinds.empty())
+        complain(fmt::format("{}: has no recording metadata; 'zulm salvage {} -o DIR' finds what no reader does", name,
+                             name));
+    else
+        complain(fmt::format("{}: has no stream {}; 'zulm info {}' lists what it has", name, fmt::join(kinds, " or "),
+                             name));
     return ExitNoMetaData;
 }
 

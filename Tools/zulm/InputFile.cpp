@@ -67,6 +67,8 @@ private:
 InputFile::InputFile(const std::string& argument) : name_(argument), path_(argument) {
     if (argument == s_standardInput)
         spool();
+    else if (std::error_code ignored; std::filesystem::is_fifo(path_, ignored))
+        throw Failure(fmt::format("{}: not a regular file; '-' reads a pipe that is standard input", path_));
     else
         requireFile(path_);
 }

@@ -58,9 +58,9 @@ std::vector<std::string> linesOf(const std::string& text) {
 
 const char* const s_aboutOutput =
     "Results go to standard output, everything else to standard error. --json, on every command that reports, prints "
-    "one document: {\"schema\": \"zulm.COMMAND\", \"schema_version\": 1, \"tool_version\": ..., \"files\": [...]}. "
-    "Where a file is read, - is standard input. Files that are written appear whole or not at all; one that is there "
-    "already is replaced only with --force.";
+    "one document: {\"schema\": \"zulm.COMMAND\", \"schema_version\": 1, \"tool_version\": ..., \"files\": [...]}; "
+    "a file that could not be read is not in it. Where a file is read, - is standard input. Files that are written "
+    "appear whole or not at all; one that is there already is replaced only with --force.";
 
 const std::vector<ExitCodeMeaning>& exitCodeMeanings() {
     static const std::vector<ExitCodeMeaning> meanings{
@@ -126,7 +126,7 @@ std::vector<ManualOption> globalOptions(const Manual& manual) {
 std::vector<std::string> groupsOf(const Manual& manual) {
     std::vector<std::string> groups;
     for (const ManualCommand& command : manual.commands)
-        if (std::ranges::find(groups, command.group) == groups.end())
+        if (std::find(groups.begin(), groups.end(), command.group) == groups.end())
             groups.push_back(command.group);
     return groups;
 }

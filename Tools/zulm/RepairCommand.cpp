@@ -50,7 +50,8 @@ void print(const RepairOptions& options, const Repair& repair) {
 }
 
 void report(const RepairOptions& options, const Repair& repair) {
-    Json file{{"path", options.save.movie}, {"output", repair.output.empty() ? Json(nullptr) : Json(repair.output)}};
+    Json file = fileHeader(options.save.movie);
+    file["output"] = repair.output.empty() ? Json(nullptr) : Json(repair.output);
     file.update(repairDocument(repair.plan));
     printReport("repair", Json::array({file}));
 }

@@ -27,12 +27,12 @@ void print(const std::string& name, const StampResult& stamped) {
 
 void report(const StampOptions& options, const std::string& name, const StampResult& stamped) {
     const CreatorAttributes& creator = stamped.info.creator;
-    const Json file{
-        {"path", options.save.movie},
+    Json file = fileHeader(options.save.movie);
+    file.update(Json{
         {"output", name},
         {"repair", repairDocument(stamped.repair)},
         {"creator",
-         {{"name", creator.name()}, {"version", creator.version()}, {"platform_version", creator.platformVersion()}}}};
+         {{"name", creator.name()}, {"version", creator.version()}, {"platform_version", creator.platformVersion()}}}});
     printReport("stamp", Json::array({file}));
 }
 
