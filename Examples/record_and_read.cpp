@@ -7,6 +7,8 @@ int main() {
     writer.write(ScreenPoint(640.5, 360), MediaTime(0, 600)); // at 0 s
     writer.write(ScreenPoint(652, 371), MediaTime(10, 600));  // at 10/600 s
     writer.finish();
+    if (!writer.isHealthy()) // a full disk, say
+        std::cerr << "only " << writer.entriesWritten() << " positions could be recorded\n";
     ZULMAtomWriter().writeMetaDataFiles({"CursorLocation.dat"}, "Recording.mp4");
 
     CursorLocationMetaDataParser parser("Recording.mp4");

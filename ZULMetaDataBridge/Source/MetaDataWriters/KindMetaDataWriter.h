@@ -26,15 +26,19 @@ public:
     KindMetaDataWriter() = default;
     ~KindMetaDataWriter() override { release(); }
 
-    /// Creates the file and writes its header. Look at the state of `metaDataWriter()->getStream()` to learn
-    /// whether that, and what was written since, has worked.
+    /// Creates the file and writes its header.
     void setup() override {
         release();
+        entriesWritten_ = 0;
         metaDataWriter_ = new StreamWriter;
         if (Release == StreamWriterRelease::Never)
             keepReachable(metaDataWriter_);
         metaDataWriter_->init(utf8Path(metaDataFile()), Kind::type, Kind::version);
     }
+
+    bool isHealthy() const override { return metaDataWriter_ && metaDataWriter_->getStream().good(); }
+
+    std::uint64_t entriesWritten() const override { return entriesWritten_; }
 
     /// Null before the first `setup`.
     StreamWriter* metaDataWriter() const { return metaDataWriter_; }
@@ -46,6 +50,13 @@ protected:
     void append(const typename Kind::Value& value, double seconds, bool flush) {
         if (metaDataWriter_)
             metaDataWriter_->write(seconds, value, flush);
+        countEntry();
+    }
+
+    /// Called behind every entry, to count it where it was taken.
+    void countEntry() {
+        if (isHealthy())
+            ++entriesWritten_;
     }
 
     void closeStream() {
@@ -63,6 +74,7 @@ private:
     }
 
     StreamWriter* metaDataWriter_ = nullptr;
+    std::uint64_t entriesWritten_ = 0;
 };
 
 /// Any number of entries, each flushed unless `setFlushEveryWrite(false)` leaves that to the file buffer.
@@ -156,6 +168,7 @@ protected:
         if (this->metaDataWriter())
             metaDataWrite(0.0, value, this->metaDataWriter()->getStream(), Kind::version);
         this->closeStream();
+        this->countEntry();
         hasWritten_ = true;
     }
 
