@@ -10,6 +10,8 @@
 
 namespace ZULMetaData {
 
+// A pipe cannot be opened, whatever waits at its other end: no opening ever hangs. `errno` says why one failed.
+
 /// Opens `path` with `mode` plus the input mode. Sets the fail bit where it cannot; otherwise clears the state.
 void fileOpen(std::ifstream& stream, const char* path, std::ios_base::openmode mode);
 

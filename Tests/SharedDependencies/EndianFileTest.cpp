@@ -6,6 +6,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cerrno>
 #include <concepts>
 #include <cstdint>
 #include <cstdio>
@@ -13,6 +14,7 @@
 #include <fstream>
 #include <sstream>
 #include <string>
+#include <sys/stat.h>
 
 namespace ZULMetaData::Test {
 
@@ -135,6 +137,24 @@ TEST_F(FileOpen, AddsNoInputModeToAStreamOfBoth) {
     both.seekg(0);
     EXPECT_EQ(both.get(), EOF);
     EXPECT_EQ(contentsOf(file), "abc");
+}
+
+TEST_F(FileOpen, FailsForAPipeInsteadOfWaitingForItsOtherEnd) {
+    const std::string pipe = folder / "pipe";
+    ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
+    open(input, pipe, {});
+    open(output, pipe, std::ios_base::trunc);
+    open(both, pipe, std::ios_base::in | std::ios_base::out);
+    EXPECT_TRUE(input.fail() && output.fail() && both.fail());
+    EXPECT_FALSE(input.is_open() || output.is_open() || both.is_open());
+    EXPECT_EQ(errno, EINVAL);
+}
+
+TEST_F(FileOpen, FailsForALinkToAPipe) {
+    ASSERT_EQ(mkfifo((folder / "pipe").c_str(), 0600), 0);
+    std::filesystem::create_symlink("pipe", folder / "link");
+    open(input, folder / "link", {});
+    EXPECT_TRUE(input.fail());
 }
 
 TEST_F(FileOpen, DoesNotCreateAFileThatIsToBeReadAndWritten) {
