@@ -5,8 +5,8 @@
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 
 #include "Tests/Support/Bytes.h"
+#include "Tests/Support/MemoryWatch.h"
 #include "Tests/ZULMetaData/CursorImageSamples.h"
-#include "Tests/ZULMetaData/MemoryWatch.h"
 #include "Tests/ZULMetaData/ReadStream.h"
 
 #include <gmock/gmock.h>

@@ -2,8 +2,8 @@
 
 #include "ZULMetaData/CursorImageSchema.h"
 
+#include "Tests/Support/MemoryWatch.h"
 #include "Tests/ZULMetaData/CursorImageSamples.h"
-#include "Tests/ZULMetaData/MemoryWatch.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

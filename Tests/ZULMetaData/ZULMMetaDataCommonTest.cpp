@@ -3,8 +3,8 @@
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 
 #include "Tests/Support/Bytes.h"
+#include "Tests/Support/MemoryWatch.h"
 #include "Tests/ZULMetaData/CursorImageSamples.h"
-#include "Tests/ZULMetaData/MemoryWatch.h"
 
 #include <gtest/gtest.h>
 

@@ -4,8 +4,8 @@
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
+#include "Tests/Support/MemoryWatch.h"
 #include "Tests/ZULMetaData/ContainerBytes.h"
-#include "Tests/ZULMetaData/MemoryWatch.h"
 #include "Tests/ZULMetaData/ReadStream.h"
 #include "Tests/ZULMetaData/StandardOutput.h"
 

@@ -2,8 +2,8 @@
 // with the invalid recordings stands in InvalidCorpusTest.
 
 #include "ZULMetaDataBridge/Source/MetaDataValidator.h"
-#include "Tests/Support/AllocationPeak.h"
 #include "Tests/Support/Files.h"
+#include "Tests/Support/MemoryWatch.h"
 #include "Tests/ZULMetaData/ContainerBytes.h"
 #include "Tests/ZULMetaData/WatchedStream.h"
 #include "Tests/ZULMetaDataBridge/KindSamples.h"
@@ -412,9 +412,9 @@ TEST(MetaDataValidator, AsksForNoMoreMemoryThanTwiceTheFileAnd16MiB) {
     };
     for (const auto& [bytes, type] : files) {
         std::istringstream stream(bytes);
-        const AllocationPeak peak;
+        const MemoryWatch memory;
         validateRecording(stream, type);
-        EXPECT_LE(peak.bytes(), 2 * bytes.size() + (std::size_t{16} << 20)) << bytes.size();
+        EXPECT_LE(memory.peak(), 2 * bytes.size() + (std::size_t{16} << 20)) << bytes.size();
     }
 }
 

@@ -10,6 +10,6 @@ foreach(path IN ITEMS ZULMetaDataBridge/InvalidCorpusTest ZULMetaDataBridge/Meta
   string(REPLACE "/" "." name ${path})
   target_link_libraries(${name} PRIVATE ZULMetaDataInvalidCorpus)
 endforeach()
-target_sources(ZULMetaDataBridge.MetaDataValidatorTest PRIVATE Support/AllocationPeak.cpp)
+target_link_libraries(ZULMetaDataBridge.MetaDataValidatorTest PRIVATE ZULMetaDataMemoryWatch)
 
 zulm_add_test(Platform/EncodedImageInfoTest)

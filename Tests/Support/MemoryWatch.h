@@ -22,6 +22,9 @@ public:
 
     /// Of `malloc` and `calloc`, less those that were freed.
     int blocks() const;
+
+    /// The most that was held at one time beyond what was held at first, in bytes, however it was asked for.
+    std::size_t peak() const;
 };
 
 } // namespace ZULMetaData::Test
