@@ -149,8 +149,28 @@ TEST_F(AttachCommand, RefusesFilesThatAreNoStreams) {
         EXPECT_THAT(result.errors, HasSubstr("a.dat: too short for a stream"));
     }
     EXPECT_THAT(runTool({"attach", plain, movie(), "-o", out}).errors, HasSubstr("'--from " + movie() + "'"));
+    EXPECT_THAT(runTool({"attach", plain, stream("a.txt", ""), "-o", out}).errors, Not(HasSubstr("--from")));
     EXPECT_EQ(runTool({"attach", plain, folder / "missing.dat", "-o", out}).exitCode, 1);
     EXPECT_EQ(runTool({"attach", plain, folder.path(), "-o", out}).exitCode, 1);
+    EXPECT_FALSE(std::filesystem::exists(out));
+}
+
+TEST_F(AttachCommand, ExaminesTheStreamsBeforeItCopiesTheMovie) {
+    const std::string large = folder / "Large.mp4"; // larger than what may be written
+    writeFile(large,
+              tinyMovie() + zulmAtom({locationStream()}) + be32((1 << 20) + 8) + "mdat" + std::string(1 << 20, 'm'));
+    const std::map<std::string, std::string> refused{
+        {stream("short.dat", "x"),
+         "short.dat: too short for a stream: 1 bytes of a 24-byte header; nothing was written"},
+        {stream("same.dat", locationStream()),
+         large + ": has a stream of the kind cursorLocation already, at offset 50; --replace puts another one in front "
+                 "of it; nothing was written"}};
+    for (const auto& [file, message] : refused) {
+        const ToolResult result =
+            runProgram("sh", {"-c", "ulimit -f 100; exec \"$0\" \"$@\"", ZULM_PATH, "attach", large, file, "-o", out});
+        EXPECT_EQ(result.exitCode, 1);
+        EXPECT_THAT(result.errors, HasSubstr(message));
+    }
     EXPECT_FALSE(std::filesystem::exists(out));
 }
 

@@ -188,6 +188,23 @@ TEST_F(ConvertCommand, WritesAFileWholeOrNotAtAll) {
     EXPECT_EQ(runTool({"convert", file, "--to", "vtt", "-o", file, "--force"}).exitCode, 1);
 }
 
+TEST_F(ConvertCommand, PutsNoFileInPlaceOfWhatIsNone) {
+    const std::string file = keys(typed(1, "a"));
+    const std::string pipe = folder / "pipe.srt";
+    ASSERT_EQ(runProgram("mkfifo", {pipe}).exitCode, 0);
+    for (const std::string& output : {pipe, folder.path().string()}) {
+        const ToolResult result = runTool({"convert", file, "--to", "srt", "-o", output, "--force"});
+        EXPECT_EQ(result.exitCode, 1);
+        EXPECT_EQ(result.errors, "zulm: " + output + ": not a regular file; choose another output\n");
+    }
+    EXPECT_TRUE(std::filesystem::is_fifo(pipe));
+}
+
+TEST_F(ConvertCommand, TakesAHyphenForStandardOutput) {
+    const std::string file = keys(typed(1, "a"));
+    EXPECT_EQ(runTool({"convert", file, "--to", "srt", "-o", "-"}).output, converted(file, {"srt"}));
+}
+
 TEST_F(ConvertCommand, SaysWhatItCannotConvert) {
     const std::string file = write("names.mp4", media() + zulmAtom({appNameStream()}));
     const ToolResult none = runTool({"convert", file, "--to", "srt"});

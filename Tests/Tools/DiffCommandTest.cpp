@@ -137,6 +137,7 @@ TEST_F(DiffCommand, FailsWhereThereIsNothingToCompare) {
     EXPECT_EQ(runTool({"diff", none, none}).exitCode, 4);
     EXPECT_EQ(runTool({"diff", movie(), folder / "missing.mp4"}).exitCode, 1);
     EXPECT_EQ(runTool({"diff", movie()}).exitCode, 2);
+    EXPECT_EQ(runTool({"diff", "-", "-"}).exitCode, 2);
 }
 
 } // namespace

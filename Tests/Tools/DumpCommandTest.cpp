@@ -90,6 +90,13 @@ TEST_F(DumpCommand, PrintsOnlyTheStreamsThatAreNamed) {
     EXPECT_EQ(lines.size(), 5U + 41U);
 }
 
+TEST_F(DumpCommand, TakesIdentifiersOfStreams) {
+    const ToolResult byIdentifier = run({"--stream", "2b7b6a08-7a1f-11e2-83d0-0017f200be7f", movie()});
+    EXPECT_EQ(byIdentifier.exitCode, 0);
+    EXPECT_EQ(byIdentifier.output, run({"--stream", "cpuUsage", movie()}).output);
+    EXPECT_EQ(run({"--stream", "2b7b6a08", movie()}).exitCode, 2);
+}
+
 TEST_F(DumpCommand, KnowsNearNamesOfStreams) {
     const ToolResult result = run({"--stream", "cursorLocatoin", movie()});
     EXPECT_EQ(result.exitCode, 2);

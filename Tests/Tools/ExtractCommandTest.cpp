@@ -100,7 +100,7 @@ TEST_F(ExtractCommand, RefusesToReplaceItsInput) {
 TEST_F(ExtractCommand, TellsAFileWithoutMetadataFromOneThatIsNone) {
     const ToolResult none = runTool({"extract", write("none.mp4", media()), "-o", folder / "out"});
     EXPECT_EQ(none.exitCode, 4);
-    EXPECT_THAT(none.errors, HasSubstr("has no recording metadata"));
+    EXPECT_THAT(none.errors, HasSubstr("has no recording metadata; 'zulm salvage "));
     EXPECT_EQ(runTool({"extract", folder / "missing.mp4", "-o", folder / "out"}).exitCode, 1);
     EXPECT_EQ(runTool({"extract", movie()}).exitCode, 2);
     const ToolResult typo = runTool({"extract", movie(), "-o", folder / "out", "--stream", "cursorLocatoin"});

@@ -115,7 +115,7 @@ TEST_F(InfoCommand, DoesNotWaitForAPipe) {
     ASSERT_EQ(runProgram("mkfifo", {folder / "pipe.mp4"}).exitCode, 0);
     const ToolResult result = run({"info", "pipe.mp4"});
     EXPECT_EQ(result.exitCode, 1);
-    EXPECT_THAT(result.errors, HasSubstr("not a regular file"));
+    EXPECT_THAT(result.errors, HasSubstr("pipe.mp4: not a regular file; '-' reads a pipe that is standard input"));
 }
 
 TEST_F(InfoCommand, TakesNamesThatAreNotUTF8) {

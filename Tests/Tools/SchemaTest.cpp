@@ -118,6 +118,21 @@ TEST_F(Schema, HoldsForAttachAndStamp) {
     expectValid({outputOf({"stamp", plain, "--creator", "a", "--creator-version", "1", "-o", folder / "stamped.mp4"})});
 }
 
+TEST_F(Schema, KeepsTheBytesOfNamesThatAreNotUTF8) {
+    const std::string strange = written("na\xff.mp4", tinyMovie());
+    const std::vector<std::string> documents{
+        outputOf({"attach", strange, streamFile("cpuUsage"), "-o", folder / "\xff.mp4"}),
+        outputOf({"repair", "--dry-run", strange}),
+        outputOf({"stamp", strange, "--creator", "a", "--creator-version", "1", "-o", folder / "\xfe.mp4"}),
+        outputOf({"info", strange})};
+    for (const std::string& document : documents) {
+        const json file = json::parse(document).at("files").at(0);
+        EXPECT_THAT(std::string(file.at("path")), testing::EndsWith("/na\xef\xbf\xbd.mp4"));
+        EXPECT_TRUE(file.contains("path_base64")) << document;
+        expectValid({document});
+    }
+}
+
 TEST_F(Schema, HoldsForExtractAndSalvage) {
     expectValid(
         {outputOf({"extract", movie(), "-o", folder / "streams"}), outputOf({"extract", odd(), "-o", folder / "odd"})});

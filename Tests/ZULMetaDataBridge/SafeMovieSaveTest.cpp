@@ -175,6 +175,23 @@ TEST_F(SafeSave, PutsTheRepairBackWhereItRefusesAfterwards) {
                 HasSubstr("already"));
 }
 
+TEST_F(SafeSave, ChecksWithoutChangingAnything) {
+    const std::string before = be32(0) + "mdat" + "0123456789";
+    writeFile(movie, before);
+    const auto check = [&](const std::vector<StreamSource>& streams) {
+        return refusal([&] { SafeMovieSave(movie).checkAttach(streams); });
+    };
+    const auto locations = sources({stream("a.dat", locationStream())});
+    SafeMovieSave(movie).checkAttach(locations);
+    EXPECT_THAT(check({}), HasSubstr("no streams to attach"));
+    EXPECT_THAT(check(sources({stream("b.dat", "x")})), HasSubstr("too short for a stream"));
+    EXPECT_EQ(contentsOf(movie), before);
+    writeFile(movie, media() + zulmAtom({locationStream()}));
+    EXPECT_THAT(check(locations), HasSubstr("has a stream of the kind cursorLocation already"));
+    SafeMovieSave(movie).checkAttach(locations, SafeMovieSave::Existing::Supersede);
+    EXPECT_EQ(contentsOf(movie), media() + zulmAtom({locationStream()}));
+}
+
 TEST_F(SafeSave, RefusesStreamsThatAreNone) {
     writeFile(movie, media());
     for (const std::size_t length : {0U, 1U, 23U})
