@@ -25,10 +25,10 @@ bool beginsLikeAtom(std::string_view bytes) {
     std::uint32_t size = 0;
     std::memcpy(&size, bytes.data(), sizeof size);
     size = swapInt(size);
+    const std::string_view type = bytes.substr(sizeof size, sizeof size);
     const auto isPrintable = [](char c) { return c >= ' ' && c <= '~'; };
     const bool isOpenOrExtended = size == 0 || size == detail::s_extendedSizeMarker;
-    return (size >= detail::s_atomHeaderSize || isOpenOrExtended) &&
-           std::ranges::all_of(bytes.substr(sizeof size, sizeof size), isPrintable);
+    return (size >= detail::s_atomHeaderSize || isOpenOrExtended) && std::all_of(type.begin(), type.end(), isPrintable);
 }
 
 } // namespace

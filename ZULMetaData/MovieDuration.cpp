@@ -11,7 +11,8 @@ namespace ZULMetaData {
 namespace {
 
 const ContainerItem* findType(const std::vector<ContainerItem>& items, std::string_view type) {
-    const auto found = std::ranges::find(items, type, &ContainerItem::type);
+    const auto found =
+        std::find_if(items.begin(), items.end(), [&](const ContainerItem& item) { return item.type == type; });
     return found == items.end() ? nullptr : &*found;
 }
 

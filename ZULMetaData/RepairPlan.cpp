@@ -40,7 +40,7 @@ struct Atom {
 std::string typeText(std::uint32_t type) {
     const auto characters = detail::bigEndianBytes(type);
     const auto isPlain = [](char c) { return c >= ' ' && c <= '~'; };
-    if (!std::ranges::all_of(characters, isPlain))
+    if (!std::all_of(characters.begin(), characters.end(), isPlain))
         return "without a readable type";
     std::string text(1, '\'');
     text.append(characters.data(), characters.size());
@@ -61,7 +61,8 @@ bool endsLikeHeader(const std::string& bytes) {
     const auto isUsual = [](char c) {
         return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == ' ' || c == '\xa9';
     };
-    return std::ranges::all_of(bytes.substr(sizeof(std::uint32_t)), isUsual);
+    const std::string name = bytes.substr(sizeof(std::uint32_t));
+    return std::all_of(name.begin(), name.end(), isUsual);
 }
 
 template <class Bytes>

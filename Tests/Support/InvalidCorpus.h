@@ -2,10 +2,10 @@
 
 // The invalid recordings in Tests/Data/invalid, and what must be found in each.
 
-#include <compare>
 #include <cstdint>
 #include <ostream>
 #include <string>
+#include <tuple>
 #include <vector>
 
 namespace ZULMetaData::Test {
@@ -14,8 +14,10 @@ struct ExpectedFinding {
     std::string code;
     std::uint64_t offset = 0;
 
-    friend auto operator<=>(const ExpectedFinding&, const ExpectedFinding&) = default;
     friend bool operator==(const ExpectedFinding&, const ExpectedFinding&) = default;
+    friend bool operator<(const ExpectedFinding& left, const ExpectedFinding& right) {
+        return std::tie(left.code, left.offset) < std::tie(right.code, right.offset);
+    }
     friend void PrintTo(const ExpectedFinding& finding, std::ostream* out) {
         *out << finding.code << '@' << finding.offset;
     }

@@ -10,6 +10,7 @@
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
+#include <algorithm>
 #include <filesystem>
 #include <map>
 
@@ -47,7 +48,7 @@ protected:
         std::vector<std::string> names;
         for (const auto& entry : std::filesystem::directory_iterator(folder.path()))
             names.push_back(entry.path().filename());
-        std::ranges::sort(names);
+        std::sort(names.begin(), names.end());
         return names;
     }
 

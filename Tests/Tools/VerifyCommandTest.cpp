@@ -34,7 +34,7 @@ struct VerifyCommand : RecordedSession {
 
 std::string invalidRecording(const std::string& name) {
     const auto files = invalidCorpus();
-    return std::ranges::find(files, name, &InvalidFile::name)->path;
+    return std::find_if(files.begin(), files.end(), [&](const InvalidFile& file) { return file.name == name; })->path;
 }
 
 std::string locations(const std::vector<double>& times) {
@@ -53,7 +53,7 @@ std::vector<ExpectedFinding> findingsIn(const Json& file) {
     collect(file["findings"]);
     for (const Json& stream : file["streams"])
         collect(stream["findings"]);
-    std::ranges::sort(findings);
+    std::sort(findings.begin(), findings.end());
     return findings;
 }
 
@@ -74,7 +74,7 @@ TEST_F(VerifyCommand, FindsNothingInTheOtherContainers) {
     arguments.insert(arguments.end(), streamFiles().begin(), streamFiles().end());
     const ToolResult result = runTool(arguments);
     EXPECT_EQ(result.exitCode, 0) << result.output;
-    EXPECT_EQ(std::ranges::count(result.output, '\n'), 3 + 17);
+    EXPECT_EQ(std::count(result.output.begin(), result.output.end(), '\n'), 3 + 17);
     EXPECT_NE(result.output.find("cursorOpacity.dat: ok (1 stream, 5 entries)\n"), std::string::npos) << result.output;
 }
 
@@ -87,7 +87,8 @@ TEST_F(VerifyCommand, FindsOutEveryInvalidRecording) {
                 ".*: [^\n]* at offset " + std::to_string(finding.offset) + ": [^\n]* \\[" + finding.code + "\\]\n.*";
             EXPECT_THAT(result.output, testing::MatchesRegex("(.|\n)*" + line + "(.|\n)*")) << file.name;
         }
-        EXPECT_EQ(static_cast<std::size_t>(std::ranges::count(result.output, '\n')), file.findings.size());
+        EXPECT_EQ(static_cast<std::size_t>(std::count(result.output.begin(), result.output.end(), '\n')),
+                  file.findings.size());
     }
 }
 
@@ -103,7 +104,7 @@ TEST_F(VerifyCommand, ReportsEveryInvalidRecordingInOneDocument) {
     ASSERT_EQ(report["files"].size(), files.size());
     for (std::size_t i = 0; i < files.size(); ++i) {
         auto expected = files[i].findings;
-        std::ranges::sort(expected);
+        std::sort(expected.begin(), expected.end());
         EXPECT_EQ(report["files"][i]["path"], files[i].path);
         EXPECT_EQ(findingsIn(report["files"][i]), expected) << files[i].name;
         EXPECT_EQ(report["files"][i]["damaged"], true);

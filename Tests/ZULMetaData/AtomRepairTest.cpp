@@ -308,7 +308,8 @@ TEST_F(AtomRepair, EndsForEverySizeAndChangesOneSizeFieldAtMost) {
             writeFile(movie, before);
             repair();
             const std::string after = contentsOf(movie);
-            const auto [was, is] = std::ranges::mismatch(before, after); // what is left is below 256 bytes: one byte
+            const auto [was, is] = std::mismatch(before.begin(), before.end(), after.begin(), after.end());
+            // What is left is below 256 bytes: one byte.
             EXPECT_EQ(after.size(), before.size());
             EXPECT_TRUE(is == after.end() || std::equal(is + 1, after.end(), was + 1, before.end())) << size;
         }

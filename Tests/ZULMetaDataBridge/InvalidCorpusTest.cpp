@@ -31,7 +31,7 @@ struct InvalidCorpus : testing::Test {
 };
 
 std::vector<ExpectedFinding> sorted(std::vector<ExpectedFinding> findings) {
-    std::ranges::sort(findings);
+    std::sort(findings.begin(), findings.end());
     return findings;
 }
 

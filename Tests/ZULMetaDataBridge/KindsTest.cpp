@@ -39,8 +39,8 @@ constexpr bool hasSamples(const uuid& type) {
 }
 
 constexpr bool isRegistered(const uuid& type, int version) {
-    return std::ranges::any_of(
-        s_metaDataKinds, [&](const MetaDataKind& kind) { return kind.type == type && kind.currentVersion == version; });
+    return std::any_of(s_metaDataKinds.begin(), s_metaDataKinds.end(),
+                       [&](const MetaDataKind& kind) { return kind.type == type && kind.currentVersion == version; });
 }
 
 constexpr bool everyRecordedKindIsRegisteredAndHasSamples() {

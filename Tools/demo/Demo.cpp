@@ -23,8 +23,10 @@ bool equal(const EntryValue& left, const EntryValue& right) {
     const auto* rightImage = std::get_if<ImagePointer>(&right);
     if (!leftImage || !rightImage)
         return left == right;
+    const auto leftPixels = (*leftImage)->rgba();
+    const auto rightPixels = (*rightImage)->rgba();
     return (*leftImage)->width() == (*rightImage)->width() && (*leftImage)->height() == (*rightImage)->height() &&
-           std::ranges::equal((*leftImage)->rgba(), (*rightImage)->rgba());
+           std::equal(leftPixels.begin(), leftPixels.end(), rightPixels.begin(), rightPixels.end());
 }
 
 bool equal(const EntryDictionary& entry, const ExpectedEntry& expected) {
@@ -41,7 +43,8 @@ bool equal(const EntryList& list, const std::vector<ExpectedEntry>& expected) {
 
 void attach(const std::vector<Track>& tracks, const FileLocation& movie) {
     std::vector<FileLocation> files;
-    std::ranges::transform(tracks, std::back_inserter(files), &Track::file);
+    for (const Track& track : tracks)
+        files.push_back(track.file);
     ZULMAtomWriter().writeMetaDataFiles(files, movie);
     ZULRAtomWriter().writeZULRtoFile(movie, "ZULMetaData demo", s_creatorVersion);
 }

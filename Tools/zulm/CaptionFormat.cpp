@@ -37,7 +37,7 @@ std::string centiseconds(std::int64_t time) {
 std::string oneLine(std::string_view text) {
     std::string line;
     for (const char c : text)
-        line += (c >= '\0' && c < ' ') || c == '\x7f' ? ' ' : c;
+        line += static_cast<unsigned char>(c) < ' ' || c == '\x7f' ? ' ' : c;
     return line;
 }
 

@@ -115,7 +115,7 @@ bool mayBeCharacter(const KeyStroke& key, const Modifiers& modifiers) {
 }
 
 std::size_t lengthOf(const std::string& text) {
-    return static_cast<std::size_t>(std::ranges::count_if(text, [](char c) { return (c & 0xc0) != 0x80; }));
+    return static_cast<std::size_t>(std::count_if(text.begin(), text.end(), [](char c) { return (c & 0xc0) != 0x80; }));
 }
 
 /// Joins the keys of a caption.
@@ -166,7 +166,8 @@ KeyLabel labelOf(const KeyStroke& key, bool showsKeys) {
 }
 
 std::vector<Caption> keyCaptions(std::vector<KeyEvent> keys, double pause, bool showsKeys) {
-    std::ranges::stable_sort(keys, {}, &KeyEvent::time);
+    std::stable_sort(keys.begin(), keys.end(),
+                     [](const KeyEvent& left, const KeyEvent& right) { return left.time < right.time; });
     std::vector<Caption> captions;
     CaptionBuilder builder(captions, pause);
     for (const KeyEvent& event : keys)
@@ -175,7 +176,8 @@ std::vector<Caption> keyCaptions(std::vector<KeyEvent> keys, double pause, bool 
 }
 
 std::vector<PlacedCaption> placed(std::vector<Caption> captions, double unitsPerSecond, double duration) {
-    std::ranges::stable_sort(captions, {}, &Caption::start);
+    std::stable_sort(captions.begin(), captions.end(),
+                     [](const Caption& left, const Caption& right) { return left.start < right.start; });
     std::vector<PlacedCaption> result;
     for (const Caption& caption : captions) {
         const double lastEnd = std::max(caption.start + s_lastDuration, std::min(duration, s_endOfTime));

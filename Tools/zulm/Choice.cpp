@@ -1,12 +1,12 @@
 #include "Tools/zulm/Choice.h"
 
+#include "Tools/zulm/Number.h"
+
 #include <cctype>
-#include <charconv>
 #include <cmath>
 #include <cstddef>
 #include <limits>
 #include <numeric>
-#include <system_error>
 
 namespace Zulm {
 
@@ -52,9 +52,8 @@ std::string nearestTo(std::string_view word, const std::vector<std::string>& can
 CLI::Option* addSeconds(CLI::App& command, const std::string& name, std::optional<double>& value,
                         const std::string& description) {
     const auto take = [&value, name](const std::string& word) {
-        double seconds = 0;
-        const auto [end, error] = std::from_chars(word.data(), word.data() + word.size(), seconds);
-        if (error != std::errc() || end != word.data() + word.size() || !std::isfinite(seconds))
+        const std::optional<double> seconds = realNumber(word);
+        if (!seconds || !std::isfinite(*seconds))
             throw CLI::ValidationError(name, fmt::format("{} is no number of seconds", word));
         value = seconds;
     };

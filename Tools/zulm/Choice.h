@@ -33,7 +33,7 @@ CLI::Option* addChoice(CLI::App& command, const std::string& name, Value& value,
     for (const auto& choice : values)
         names.push_back(choice.first);
     const auto choose = [&value, values = std::move(values), names, name](const std::string& word) {
-        const auto found = std::ranges::find(names, word);
+        const auto found = std::find(names.begin(), names.end(), word);
         if (found == names.end())
             throw CLI::ValidationError(
                 name, fmt::format("{} is none of {}{}", word, fmt::join(names, ", "), suggestionFor(word, names)));

@@ -42,7 +42,7 @@ void say(const std::string& message) {
 
 ExitCode worseOf(ExitCode left, ExitCode right) {
     constexpr std::array fromBestToWorst{ExitFine, ExitNoMetaData, ExitDamaged, ExitUsage, ExitFailed};
-    const auto rank = [&](ExitCode code) { return std::ranges::find(fromBestToWorst, code); };
+    const auto rank = [&](ExitCode code) { return std::find(fromBestToWorst.begin(), fromBestToWorst.end(), code); };
     return rank(left) < rank(right) ? right : left;
 }
 

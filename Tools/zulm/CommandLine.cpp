@@ -45,12 +45,14 @@ std::string unexpectedText(const CLI::App& app) {
     const CLI::App& command = namedCommand(app);
     const auto words = app.remaining(true);
     const auto isOption = [](const std::string& word) { return word.starts_with("-"); };
-    const auto word = std::ranges::find_if(words, [&](const auto& w) { return &command == &app && !isOption(w); });
+    const auto isCommand = [&](const std::string& word) { return &command == &app && !isOption(word); };
+    const auto word = std::find_if(words.begin(), words.end(), isCommand);
     if (word != words.end())
         return fmt::format("no command is called {}{}", *word, suggestionFor(*word, commandNames(app)));
     const std::string& first = words.front();
     auto names = optionNames(command);
-    std::ranges::copy(optionNames(app), std::back_inserter(names));
+    for (const std::string& name : optionNames(app))
+        names.push_back(name);
     return isOption(first) ? fmt::format("no option is called {}{}", first, suggestionFor(first, names))
                            : fmt::format("{} is one argument too many", first);
 }

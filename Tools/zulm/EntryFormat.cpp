@@ -1,5 +1,6 @@
 #include "Tools/zulm/EntryFormat.h"
 
+#include "Tools/zulm/Number.h"
 #include "Tools/zulm/Report.h"
 
 #include <fmt/core.h>
@@ -29,9 +30,7 @@ Json shortestNumber(float value) {
         return numberDocument(value);
     std::array<char, 64> digits{};
     const auto end = std::to_chars(digits.data(), digits.data() + digits.size(), value).ptr;
-    double number = 0;
-    std::from_chars(digits.data(), end, number);
-    return number;
+    return *realNumber(std::string(digits.data(), end));
 }
 
 Json document(std::int32_t value) {

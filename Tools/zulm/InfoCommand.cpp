@@ -155,7 +155,7 @@ void print(const FileInfo& file) {
 void warnOf(const FileInfo& file) {
     constexpr std::size_t most = 5;
     std::vector<Finding> damage;
-    std::ranges::copy_if(file.warnings, std::back_inserter(damage), isDamage);
+    std::copy_if(file.warnings.begin(), file.warnings.end(), std::back_inserter(damage), isDamage);
     for (std::size_t i = 0; i < std::min(most, damage.size()); ++i)
         warn(fmt::format("{}: {}", file.name, findingText(damage[i])));
     if (file.isDamaged)

@@ -93,8 +93,8 @@ std::string manPage(const Manual& manual) {
     page += fmt::format(".SH DESCRIPTION\n{}\n.PP\n{}\n", roff(manual.description), roff(s_aboutOutput));
     for (const std::string& group : groupsOf(manual)) {
         std::string title = group;
-        std::ranges::transform(title, title.begin(),
-                               [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 32) : c; });
+        std::transform(title.begin(), title.end(), title.begin(),
+                       [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 32) : c; });
         page += fmt::format(".SH COMMANDS: {}\n", title) + eachCommand(manual, group, roffCommand);
     }
     page += ".SH OPTIONS OF EVERY COMMAND\n";

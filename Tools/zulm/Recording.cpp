@@ -31,10 +31,10 @@ private:
 /// The first thing that is wrong, and how much else.
 std::string damageIn(const StreamReport& stream) {
     const auto isDamage = [](const Finding& finding) { return finding.severity() == Severity::Damage; };
-    const auto first = std::ranges::find_if(stream.findings, isDamage);
+    const auto first = std::find_if(stream.findings.begin(), stream.findings.end(), isDamage);
     if (first == stream.findings.end())
         return {};
-    const auto others = std::ranges::count_if(stream.findings, isDamage) - 1;
+    const auto others = std::count_if(stream.findings.begin(), stream.findings.end(), isDamage) - 1;
     return fmt::format("at offset {}: {}{}", first->offset, first->sentence,
                        others == 0 ? std::string() : fmt::format(" ({} more)", others));
 }
@@ -83,7 +83,8 @@ StreamInfo Recording::streamInfo(const uuid& type) {
     const MetaDataKind* kind = findMetaDataKind(type);
     info.kind = kind ? kind->name : std::string_view();
     const auto& streams = validation().streams;
-    const auto found = std::ranges::find(streams, info.range.offset, &StreamReport::offset);
+    const auto found = std::find_if(streams.begin(), streams.end(),
+                                    [&](const StreamReport& stream) { return stream.offset == info.range.offset; });
     if (found == streams.end() || found->presentBytes < s_metaDataHeaderSize) {
         info.damage = "it could not be examined";
         return info;

@@ -1,5 +1,6 @@
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/Number.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/RedactedCopy.h"
 #include "Tools/zulm/Report.h"
@@ -9,7 +10,7 @@
 
 #include <fmt/core.h>
 
-#include <charconv>
+#include <cmath>
 #include <limits>
 #include <memory>
 #include <optional>
@@ -35,11 +36,10 @@ struct RedactOptions {
 double secondsIn(const std::string& text, double open) {
     if (text.empty())
         return open;
-    double seconds = 0;
-    const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), seconds);
-    if (error != std::errc() || end != text.data() + text.size() || seconds != seconds)
+    const std::optional<double> seconds = realNumber(text);
+    if (!seconds || std::isnan(*seconds))
         throw CLI::ValidationError(fmt::format("--range: {} is no number of seconds", text));
-    return seconds;
+    return *seconds;
 }
 
 /// "10:20", ":20" or "10:".

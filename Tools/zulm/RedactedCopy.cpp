@@ -110,7 +110,7 @@ void RedactedCopy::requireNothingHidden() {
 }
 
 bool RedactedCopy::isKept(std::uint64_t offset) const {
-    return std::ranges::none_of(items_, [offset](const ContainerItem& item) {
+    return std::none_of(items_.begin(), items_.end(), [offset](const ContainerItem& item) {
         return item.holdsMetaData() && item.offset <= offset && offset < item.end();
     });
 }

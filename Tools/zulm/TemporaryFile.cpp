@@ -40,7 +40,8 @@ void watchSignals() {
 }
 
 void remember(const std::string& path) {
-    const auto slot = std::ranges::find_if(s_slots, [](const Slot& candidate) { return !candidate.isUsed; });
+    const auto slot =
+        std::find_if(s_slots.begin(), s_slots.end(), [](const Slot& candidate) { return !candidate.isUsed; });
     if (slot == s_slots.end() || path.size() >= slot->path.size())
         return;
     std::memcpy(slot->path.data(), path.c_str(), path.size() + 1);

@@ -1,33 +1,20 @@
 #include "Tools/zulm/TextPattern.h"
 
+#include "Tools/zulm/Expression.h"
+
 #include <CLI/CLI.hpp>
 #include <fmt/core.h>
-#include <re2/re2.h>
 
 namespace Zulm {
 
-namespace {
-
-RE2::Options optionsFor(bool ignoreCase, bool isFixed) {
-    RE2::Options options;
-    options.set_log_errors(false);
-    options.set_case_sensitive(!ignoreCase);
-    options.set_literal(isFixed);
-    return options;
-}
-
-} // namespace
-
 TextPattern::TextPattern(const std::string& pattern, bool ignoreCase, bool isFixed)
-    : expression_(std::make_unique<RE2>(pattern, optionsFor(ignoreCase, isFixed))) {
-    if (!expression_->ok())
-        throw CLI::ValidationError(fmt::format("{} is no regular expression: {}", pattern, expression_->error()));
+    : expression_(compileExpression(pattern.data(), pattern.size(), ignoreCase, isFixed), releaseExpression) {
+    if (const char* error = errorIn(*expression_))
+        throw CLI::ValidationError(fmt::format("{} is no regular expression: {}", pattern, error));
 }
-
-TextPattern::~TextPattern() = default;
 
 bool TextPattern::matches(const std::string& text) const {
-    return RE2::PartialMatch(text, *expression_);
+    return isFoundIn(text.data(), text.size(), *expression_);
 }
 
 } // namespace Zulm

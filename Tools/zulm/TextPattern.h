@@ -3,26 +3,21 @@
 #include <memory>
 #include <string>
 
-namespace re2 {
-class RE2;
-}
-
 namespace Zulm {
+
+class Expression;
 
 /// A regular expression that is looked for in texts, in time that grows with the text alone, whatever the expression.
 class TextPattern {
 public:
     /// Throws the usage error for what is no expression. `isFixed` takes every character for itself.
     TextPattern(const std::string& pattern, bool ignoreCase, bool isFixed);
-    ~TextPattern();
-    TextPattern(const TextPattern&) = delete;
-    TextPattern& operator=(const TextPattern&) = delete;
 
     /// Whether it is anywhere in `text`, which is UTF-8.
     bool matches(const std::string& text) const;
 
 private:
-    std::unique_ptr<re2::RE2> expression_;
+    std::unique_ptr<Expression, void (*)(Expression*) noexcept> expression_;
 };
 
 } // namespace Zulm

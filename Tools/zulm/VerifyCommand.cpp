@@ -8,6 +8,7 @@
 #include <fmt/core.h>
 
 #include <algorithm>
+#include <functional>
 #include <memory>
 #include <stdexcept>
 
@@ -97,9 +98,10 @@ Json fileDocument(const std::string& name, const ValidationReport& report) {
 
 /// What to run next.
 void advise(const std::string& name, const ValidationReport& report) {
-    if (std::ranges::any_of(report.findings, [](const Finding& f) { return f.code == FindingCode::OpenEndedAtom; }))
+    const auto isOpenEnded = [](const Finding& finding) { return finding.code == FindingCode::OpenEndedAtom; };
+    if (std::any_of(report.findings.begin(), report.findings.end(), isOpenEnded))
         warn(fmt::format("{}: 'zulm repair --dry-run {}' says whether its last atom can be closed", name, name));
-    if (!std::ranges::all_of(report.streams, &StreamReport::isReachable))
+    if (!std::all_of(report.streams.begin(), report.streams.end(), std::mem_fn(&StreamReport::isReachable)))
         warn(fmt::format("{}: 'zulm salvage {} -o DIR' writes out the streams that no reader finds", name, name));
 }
 

@@ -19,7 +19,8 @@ std::vector<Finding> ValidationReport::allFindings() const {
     std::vector<Finding> all = findings;
     for (const StreamReport& stream : streams)
         all.insert(all.end(), stream.findings.begin(), stream.findings.end());
-    std::ranges::stable_sort(all, {}, &Finding::offset);
+    std::stable_sort(all.begin(), all.end(),
+                     [](const Finding& left, const Finding& right) { return left.offset < right.offset; });
     return all;
 }
 

@@ -70,7 +70,7 @@ bool canBeHeader(const MetaDataHeader& header) {
         return header.fixedEntrySize == entrySizeOf(header);
     constexpr std::array sizes{0U, unsigned{sizeof(double) + sizeof(int)}, unsigned{sizeof(double) + sizeof(Point)},
                                unsigned{sizeof(double) + sizeof(Rect)}};
-    return std::ranges::find(sizes, header.fixedEntrySize) != sizes.end();
+    return std::find(sizes.begin(), sizes.end(), header.fixedEntrySize) != sizes.end();
 }
 
 template <class Number>
@@ -211,12 +211,13 @@ void StreamSalvage::consider(std::string_view bytes, std::string_view before, st
 
 void StreamSalvage::measureAll() {
     std::erase_if(candidates_, [this](const Candidate& candidate) {
-        return std::ranges::any_of(
-            reachable_, [&](const Candidate& other) { return other.stream.offset == candidate.stream.offset; });
+        return std::any_of(reachable_.begin(), reachable_.end(),
+                           [&](const Candidate& other) { return other.stream.offset == candidate.stream.offset; });
     });
     std::erase_if(candidates_, [this](Candidate& candidate) { return !beginsLikeStream(candidate.stream); });
-    std::ranges::copy(reachable_, std::back_inserter(candidates_));
-    std::ranges::sort(candidates_, {}, [](const Candidate& candidate) { return candidate.stream.offset; });
+    candidates_.insert(candidates_.end(), reachable_.begin(), reachable_.end());
+    std::sort(candidates_.begin(), candidates_.end(),
+              [](const Candidate& left, const Candidate& right) { return left.stream.offset < right.stream.offset; });
     std::uint64_t coveredEnd = 0;
     for (std::size_t index = 0; index < candidates_.size(); ++index) {
         Candidate& candidate = candidates_[index];
@@ -307,10 +308,12 @@ SalvageReport StreamSalvage::report() {
     for (const Candidate& candidate : candidates_)
         if (candidate.isStream)
             report.streams.push_back(candidate.stream);
-    std::ranges::sort(report.streams, {}, [](const SalvagedStream& stream) {
+    const auto rank = [](const SalvagedStream& stream) {
         constexpr std::uint64_t most = ~std::uint64_t{0};
         return std::tuple(stream.header.uuid, most - stream.entries, stream.origin, most - stream.offset);
-    });
+    };
+    std::sort(report.streams.begin(), report.streams.end(),
+              [&](const SalvagedStream& left, const SalvagedStream& right) { return rank(left) < rank(right); });
     return report;
 }
 
