@@ -149,7 +149,8 @@ void MetaDataWriter<T, A, B>::init(const std::string& filePath, const uuid& type
     path = filePath;
     if (!buffer)
         buffer = std::make_unique<char[]>(s_bufferSize);
-    stream.rdbuf()->pubsetbuf(buffer.get(), s_bufferSize);
+    if (!stream.is_open()) // of an open file, what waits in the buffer may be lost
+        stream.rdbuf()->pubsetbuf(buffer.get(), s_bufferSize);
     fileOpen(stream, path.c_str(), std::ios_base::binary | std::ios_base::out | std::ios_base::trunc);
     writeHeader(typeUuid, version);
     detail::StreamBufferAccess::shortenPutArea(*stream.rdbuf(), s_metaDataHeaderSize); // blocks end on page boundaries
