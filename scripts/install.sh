@@ -8,6 +8,10 @@ media=(ffmpeg)
 test=(libgtest-dev libgmock-dev imagemagick pngcheck libimage-exiftool-perl mediainfo groff-base python3-jsonschema zsh fish)
 check=(clang clang-format git)
 reliability=(python3 valgrind strace)
+libcxx=(clang libc++-dev libc++abi-dev googletest)
+arm64=(g++-aarch64-linux-gnu qemu-user googletest libpng-dev:arm64 libtiff-dev:arm64 libfmt-dev:arm64 libre2-dev:arm64)
+macos=(binutils file)
+command -v npm >/dev/null || macos+=(npm)
 
 packages=()
 for group in "$@"; do
@@ -25,5 +29,6 @@ echo "== installing ${missing[*]}"
 as_root=()
 [ "$(id -u)" -eq 0 ] || as_root=(sudo)
 export DEBIAN_FRONTEND=noninteractive
+if [[ " ${missing[*]} " == *:arm64\ * ]]; then "${as_root[@]}" dpkg --add-architecture arm64; fi
 "${as_root[@]}" apt-get update -qq
 "${as_root[@]}" apt-get install -y -qq --no-install-recommends "${missing[@]}" >/dev/null

@@ -1,12 +1,16 @@
 #!/usr/bin/env bash
 # Builds everything and runs every test. Usage: scripts/test.sh [PRESET]; PRESET is dev where none is named, asan
-# for the sanitizers, clang for the other compiler, or any other preset with tests.
+# for the sanitizers, clang for the other compiler, libcxx for the other standard library with it, arm64 for that
+# processor under an emulator, or any other preset with tests.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 preset=${1:-dev}
 
 scripts/install.sh build media test
-if [ "$preset" = clang ]; then scripts/install.sh check; fi
+case "$preset" in
+    clang) scripts/install.sh check ;;
+    libcxx | arm64) scripts/install.sh "$preset" ;;
+esac
 
 echo "== building ($preset)"
 cmake --preset "$preset" >/dev/null

@@ -1,0 +1,7 @@
+# Debian's cross compiler for 64-bit ARM, with the arm64 libraries that stand beside this machine's own. Programs run
+# under an emulator.
+set(CMAKE_SYSTEM_NAME Linux)
+set(CMAKE_SYSTEM_PROCESSOR aarch64)
+set(CMAKE_C_COMPILER aarch64-linux-gnu-gcc)
+set(CMAKE_CXX_COMPILER aarch64-linux-gnu-g++)
+set(CMAKE_CROSSCOMPILING_EMULATOR /usr/bin/qemu-aarch64)
