@@ -48,16 +48,18 @@ private:
     std::uint64_t total_;
 };
 
-/// Out of the stream's get area, where all that is passed over and wanted lies in it. A walk over small entries
-/// comes this way almost every time.
+/// Out of the stream's get area, where all that is passed over and wanted lies in it. A walk over small entries comes
+/// this way almost every time, and so does one that goes back: an atom may end inside the header that was read.
 inline bool PositionedInput::readBuffered(void* bytes, std::size_t size) {
     std::streambuf& buffer = *stream_.rdbuf();
-    const std::uint64_t distance = position_ - streamPosition_; // huge where the way leads back
-    const std::size_t available = StreamBufferAccess::available(buffer);
-    if (distance > available || size > available - distance || !enoughBytesLeft(size) || !stream_.good())
+    const auto distance = static_cast<std::ptrdiff_t>(position_ - streamPosition_);
+    const auto before = static_cast<std::ptrdiff_t>(StreamBufferAccess::passed(buffer));
+    const auto available = static_cast<std::ptrdiff_t>(StreamBufferAccess::available(buffer));
+    if (distance < -before || distance > available || size > static_cast<std::size_t>(available - distance) ||
+        !enoughBytesLeft(size) || !stream_.good())
         return false;
     std::memcpy(bytes, StreamBufferAccess::getPosition(buffer) + distance, size);
-    StreamBufferAccess::advanceGet(buffer, static_cast<std::size_t>(distance) + size);
+    StreamBufferAccess::moveGet(buffer, distance + static_cast<std::ptrdiff_t>(size));
     position_ = streamPosition_ = position_ + size;
     return true;
 }

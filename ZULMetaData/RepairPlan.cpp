@@ -72,11 +72,7 @@ std::string text(const Bytes& bytes) {
 
 class Planner {
 public:
-    explicit Planner(std::istream& movie) : movie_(movie) {
-        movie_.clear();
-        movie_.seekg(0);
-        total_ = static_cast<std::uint64_t>(ParserUtil::calcFileSize(movie_));
-    }
+    explicit Planner(std::istream& movie) : input_(movie, 0, sizeOf(movie)), total_(input_.total()) {}
 
     RepairPlan plan() {
         walk();
@@ -88,6 +84,13 @@ public:
     }
 
 private:
+    /// Leaves it at its start.
+    static std::uint64_t sizeOf(std::istream& movie) {
+        movie.clear();
+        movie.seekg(0);
+        return static_cast<std::uint64_t>(ParserUtil::calcFileSize(movie));
+    }
+
     void walk();
     void walkOver(const Atom& atom, std::uint64_t& position);
 
@@ -102,6 +105,7 @@ private:
     bool isAppended(std::uint64_t position);
     bool beginsStreamAtom(std::uint64_t position);
 
+    std::size_t read(std::uint64_t position, std::span<char> bytes);
     std::string bytesAt(std::uint64_t position, std::uint64_t count);
     std::optional<Atom> atomAt(std::uint64_t position);
     std::optional<Atom> streamAtomAt(std::uint64_t position);
@@ -110,28 +114,32 @@ private:
     void find(const Atom& atom, const std::string& what);
     void giveUp(const Atom& atom, const std::string& what);
 
-    std::istream& movie_;
-    std::uint64_t total_ = 0;
+    detail::PositionedInput input_;
+    std::uint64_t total_;
     RepairPlan plan_;
 };
 
+/// As `ReadBytes`, by the input that the walk goes on with.
+std::size_t Planner::read(std::uint64_t position, std::span<char> bytes) {
+    const std::uint64_t left = total_ - std::min(position, total_);
+    const auto size = static_cast<std::size_t>(std::min<std::uint64_t>(bytes.size(), left));
+    return input_.moveTo(position) && input_.read(bytes.data(), size) ? size : 0;
+}
+
 std::string Planner::bytesAt(std::uint64_t position, std::uint64_t count) {
     std::string bytes(static_cast<std::size_t>(count), '\0');
-    bytes.resize(readingFrom(movie_)(position, bytes));
+    bytes.resize(read(position, bytes));
     return bytes;
 }
 
 /// None where the file ends inside the header.
 std::optional<Atom> Planner::atomAt(std::uint64_t position) {
-    movie_.clear();
-    movie_.seekg(static_cast<std::streamoff>(position));
-    detail::PositionedInput input(movie_, position, total_);
     Atom atom;
     atom.start = position;
-    if (!input.readBigEndian(atom.shortSize) || !input.readBigEndian(atom.type))
+    if (!input_.moveTo(position) || !input_.readBigEndian(atom.shortSize) || !input_.readBigEndian(atom.type))
         return std::nullopt;
     atom.size = atom.shortSize;
-    if (atom.isExtended() && !input.readBigEndian(atom.size))
+    if (atom.isExtended() && !input_.readBigEndian(atom.size))
         return std::nullopt;
     return atom;
 }
@@ -279,7 +287,10 @@ bool Planner::beginsStreamAtom(std::uint64_t position) {
 std::uint64_t Planner::endOfTornStream(const Atom& stream) {
     plan_.hasLoss = true;
     const std::uint64_t payload = stream.start + stream.headerSize();
-    const auto extent = measureStream(movie_, payload, total_ - payload);
+    const auto readPayload = [&](std::uint64_t position, std::span<char> bytes) {
+        return read(payload + position, bytes);
+    };
+    const auto extent = measureStream(readPayload, total_ - payload);
     const std::uint64_t end = payload + (extent ? extent->wholeBytes : 0);
     if (!extent || streamAtomAt(end))
         return total_; // its length counts a torn tail that is not there, and more streams follow
