@@ -179,6 +179,23 @@ TEST_F(CommandLine, KeepsWhatItPrintsOutOfTheFilesThatItOpens) {
     EXPECT_THAT(after, Not(HasSubstr("zulm:")));
 }
 
+TEST_F(CommandLine, SuggestsCommandsThatCanBePasted) {
+    const std::string file = folder / "my $movie.mp4";
+    writeFile(file, contentsOf(movie()).substr(0, contentsOf(movie()).size() - 1));
+    const std::string suggestion = R"(zulm verify ")" + folder.path().string() + R"(/my \$movie.mp4")";
+    EXPECT_THAT(runTool({"info", file}).errors, HasSubstr("'" + suggestion + "'"));
+}
+
+TEST_F(CommandLine, SendsNoControlCharactersOfAFileNameToATerminal) {
+    const std::string file = folder / "a\x1b[31m\xc2\x9b.mp4";
+    writeFile(file, contentsOf(movie()).substr(0, contentsOf(movie()).size() - 1));
+    for (const char* command : {"info", "verify", "atoms", "dump"}) {
+        const ToolResult result = runTool({command, file});
+        EXPECT_THAT(result.output + result.errors, Not(HasSubstr("\x1b"))) << command;
+        EXPECT_THAT(result.output + result.errors, Not(HasSubstr("\xc2\x9b"))) << command;
+    }
+}
+
 TEST_F(CommandLine, EndsWithTheNumberOfTheSignal) {
     ToolOptions options;
     options.input = tinyMovie();

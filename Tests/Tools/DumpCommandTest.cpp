@@ -104,9 +104,11 @@ TEST_F(DumpCommand, KnowsNearNamesOfStreams) {
     EXPECT_THAT(result.errors, HasSubstr("slideComment, recordingScaleFactor, systemData"));
 }
 
-TEST_F(DumpCommand, FailsForAStreamThatTheFileLacks) {
-    const ToolResult result = run({"--stream", "cpuUsage", written("a.dat", locations())});
-    EXPECT_EQ(result.exitCode, 1);
+TEST_F(DumpCommand, TellsWhichStreamTheFileLacksAndPrintsTheOthers) {
+    const ToolResult result =
+        run({"--stream", "cpuUsage", "--stream", "cursorLocation", written("a.dat", locations())});
+    EXPECT_EQ(result.exitCode, 4);
+    EXPECT_THAT(result.output, HasSubstr("x=10"));
     EXPECT_THAT(result.errors, HasSubstr("a.dat: has no stream cpuUsage; 'zulm info a.dat' lists what it has"));
 }
 

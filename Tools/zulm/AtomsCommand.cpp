@@ -70,7 +70,7 @@ void printItem(const LayoutItem& entry, int depth) {
 }
 
 void print(const Recording& recording, const Layout& layout) {
-    writeOutput(fmt::format("{}: {}, {} bytes\n", recording.name(), recording.container(), layout.fileSize));
+    writeOutput(fmt::format("{}: {}, {} bytes\n", shown(recording.name()), recording.container(), layout.fileSize));
     writeOutput(
         heading(fmt::format("  {:<12}  {:>16}  {:>16}  {:<10}  {}", "type", "offset", "size", "header", "stream")) +
         '\n');
@@ -84,7 +84,8 @@ ExitCode showAtoms(const std::string& path, const AtomsOptions& options, Json& f
     const InputFile input(path);
     Recording recording(input.path(), input.name());
     if (recording.parser().getStreamType() == MetaDataParser::RawStream)
-        throw Failure(fmt::format("{}: a bare stream has no atoms; 'zulm info {}' shows what it is", path, path));
+        throw Failure(
+            fmt::format("{}: a bare stream has no atoms; 'zulm info {}' shows what it is", path, shellWord(path)));
     const Layout layout = layoutOf(recording.parser());
     for (const LayoutEnd& end : layout.ends)
         warn(fmt::format("{}: the walk ends at offset {}: {}", path, end.offset, end.reason));

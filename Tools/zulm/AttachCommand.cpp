@@ -2,6 +2,7 @@
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -54,7 +55,7 @@ void takeStreamFiles(const AttachOptions& options, Streams& streams) {
 }
 
 void complainAboutOldMovie(const std::string& path, const std::string& what, Streams& streams) {
-    complain(fmt::format("{}: {}; 'zulm salvage {} -o DIR' may find more", path, what, path));
+    complain(fmt::format("{}: {}; 'zulm salvage {} -o DIR' may find more", path, what, shellWord(path)));
     streams.code = ExitDamaged;
 }
 
@@ -117,7 +118,7 @@ const char* cutText(StreamExtent::End end) {
 
 void print(const std::string& name, const AttachResult& attached) {
     printRepair(name, attached.repair);
-    writeOutput(fmt::format("{}: {} stream{} attached\n", name, attached.streams.size(),
+    writeOutput(fmt::format("{}: {} stream{} attached\n", shown(name), attached.streams.size(),
                             attached.streams.size() == 1 ? "" : "s"));
     for (const AttachedStream& stream : attached.streams)
         writeOutput(fmt::format("  {:<23}  {:>9} {:<7}  {:>10} bytes\n", nameOf(stream.type), stream.entries,

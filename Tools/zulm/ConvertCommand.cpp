@@ -94,7 +94,7 @@ private:
                                  recording_.name(), stream.name(), skipped, skipped == 1 ? "entry" : "entries"));
         if (end < stream.declared)
             complain(fmt::format("{}: {} cannot be read from offset {} on; 'zulm verify {}' says more",
-                                 recording_.name(), stream.name(), stream.offset + end, recording_.name()));
+                                 recording_.name(), stream.name(), stream.offset + end, shellWord(recording_.name())));
         if (skipped > 0 || end < stream.declared)
             code_ = ExitDamaged;
     }

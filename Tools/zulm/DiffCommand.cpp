@@ -72,7 +72,7 @@ public:
         if (rest() == 0)
             return ExitFine;
         complain(fmt::format("{}: {} cannot be read from offset {} on; 'zulm verify {}' says more", recording_.name(),
-                             stream_.name(), stream_.offset + end_, recording_.name()));
+                             stream_.name(), stream_.offset + end_, shellWord(recording_.name())));
         return ExitDamaged;
     }
 
@@ -229,7 +229,7 @@ private:
         code_ = ExitDamaged;
         addStream(stream, {{"status", status}});
         if (!options_.json)
-            writeOutput(fmt::format("{}: only in {}\n", stream.name(), file));
+            writeOutput(fmt::format("{}: only in {}\n", stream.name(), shown(file)));
     }
 
     void compare(const HeldStream& leftStream, const HeldStream& rightStream) {

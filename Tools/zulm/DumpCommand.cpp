@@ -9,6 +9,7 @@
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -198,7 +199,7 @@ ExitCode dumpEntries(Recording& recording, const DumpOptions& options, Printout&
     recording.readEntries<typename Kind::Value>(stream, printer);
     if (!stream.damage.empty())
         warn(fmt::format("{}: {} {}; 'zulm verify {}' says more", recording.name(), stream.kind, stream.damage,
-                         recording.name()));
+                         shellWord(recording.name())));
     say(fmt::format("{}: {} entries of {} read", recording.name(), printer.read(), stream.kind));
     return stream.damage.empty() ? ExitFine : ExitDamaged;
 }
@@ -219,36 +220,39 @@ ExitCode dumpStream(Recording& recording, const DumpOptions& options, Printout& 
     return code;
 }
 
-std::vector<uuid> chosenTypes(const Recording& recording, const std::vector<uuid>& available,
-                              const DumpOptions& options) {
-    if (options.kinds.empty())
-        return available;
+struct Choice {
     std::vector<uuid> types;
+    std::vector<std::string> missing;
+};
+
+Choice chosenTypes(const std::vector<uuid>& available, const DumpOptions& options) {
+    if (options.kinds.empty())
+        return {available, {}};
+    Choice choice;
     for (const std::string& name : options.kinds) {
         const uuid type = typeNamed(name);
         if (std::find(available.begin(), available.end(), type) == available.end())
-            throw Failure(fmt::format("{}: has no stream {}; 'zulm info {}' lists what it has", recording.name(), name,
-                                      recording.name()));
-        if (std::find(types.begin(), types.end(), type) == types.end())
-            types.push_back(type);
+            choice.missing.push_back(name);
+        else if (std::find(choice.types.begin(), choice.types.end(), type) == choice.types.end())
+            choice.types.push_back(type);
     }
-    return types;
+    return choice;
 }
 
 ExitCode runDump(const DumpOptions& options) {
     const InputFile input(options.file);
     Recording recording(input.path(), input.name());
     const std::vector<uuid> available = recording.parser().getAvailableMetaDataUUIDs();
-    const std::vector<uuid> types = available.empty() ? available : chosenTypes(recording, available, options);
+    const auto [types, missing] = available.empty() ? Choice() : chosenTypes(available, options);
     if (!options.imageFolder.empty())
         std::filesystem::create_directories(options.imageFolder);
     Printout printout(options, recording);
-    ExitCode worst = available.empty() ? ExitNoMetaData : ExitFine;
+    ExitCode worst = ExitFine;
     for (const uuid& type : types)
         worst = worseOf(worst, dumpStream(recording, options, printout, recording.streamInfo(type), types.size() == 1));
     printout.end();
-    if (available.empty())
-        complainAboutNothing(recording, {});
+    if (available.empty() || !missing.empty())
+        worst = worseOf(worst, complainAboutNothing(recording, missing));
     return worst;
 }
 

@@ -2,6 +2,7 @@
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -27,7 +28,7 @@ ExitCode complainAboutCut(const std::string& file, const HeldStream& stream) {
         return ExitFine;
     complain(fmt::format("{}: {} at offset {} declares {} bytes, of which {} are there; 'zulm salvage {} -o DIR' may "
                          "find more",
-                         file, stream.name(), stream.offset, stream.declared, stream.present, file));
+                         file, stream.name(), stream.offset, stream.declared, stream.present, shellWord(file)));
     return ExitDamaged;
 }
 

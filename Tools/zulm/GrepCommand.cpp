@@ -58,7 +58,7 @@ private:
             return;
         isDamaged_ = true;
         complain(fmt::format("{}: {} cannot be searched from offset {} on; 'zulm verify {}' says more", input_.name(),
-                             stream.name(), stream.offset + end, input_.name()));
+                             stream.name(), stream.offset + end, shellWord(input_.name())));
     }
 
     /// Gives how many bytes of the stream were searched.
@@ -80,7 +80,7 @@ private:
             document_["matches"].push_back(
                 {{"stream", stream.name()}, {"timestamp", numberDocument(time)}, {"text", text}});
         else
-            writeOutput(fmt::format("{}:{}:{:.6f}: {}\n", input_.name(), stream.name(), time, shown(text)));
+            writeOutput(fmt::format("{}:{}:{:.6f}: {}\n", shown(input_.name()), stream.name(), time, shown(text)));
     }
 
     const GrepOptions& options_;

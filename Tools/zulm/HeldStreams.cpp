@@ -3,6 +3,7 @@
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
+#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 #include <fmt/ranges.h>
@@ -88,10 +89,10 @@ ExitCode complainAboutNothing(const Recording& recording, const std::vector<std:
     const std::string& name = recording.name();
     if (kinds.empty())
         complain(fmt::format("{}: has no recording metadata; 'zulm salvage {} -o DIR' finds what no reader does", name,
-                             name));
+                             shellWord(name)));
     else
         complain(fmt::format("{}: has no stream {}; 'zulm info {}' lists what it has", name, fmt::join(kinds, " or "),
-                             name));
+                             shellWord(name)));
     return ExitNoMetaData;
 }
 

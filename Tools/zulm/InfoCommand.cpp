@@ -134,7 +134,7 @@ void printRow(const StreamInfo& stream) {
 
 void print(const FileInfo& file) {
     const std::string duration = file.duration ? fmt::format("{:.3f} s", *file.duration) : "duration not told";
-    writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", file.name, file.container, duration,
+    writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", shown(file.name), file.container, duration,
                             bytesText(file.layout.fileSize), file.streams.size(), file.streams.size() == 1 ? "" : "s"));
     if (!file.streams.empty())
         writeOutput(heading(fmt::format("  {:<23}  {:>9}  {:>10}  {:>10}  {:>8}  {:>10}  {:>7}  {}", "kind", "entries",
@@ -159,7 +159,7 @@ void warnOf(const FileInfo& file) {
     for (std::size_t i = 0; i < std::min(most, damage.size()); ++i)
         warn(fmt::format("{}: {}", file.name, findingText(damage[i])));
     if (file.isDamaged)
-        warn(fmt::format("{}: 'zulm verify {}' says {}", file.name, file.name,
+        warn(fmt::format("{}: 'zulm verify {}' says {}", file.name, shellWord(file.name),
                          damage.size() > most ? fmt::format("{} more", damage.size() - most) : "what that means"));
 }
 

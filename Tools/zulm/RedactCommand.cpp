@@ -100,7 +100,7 @@ ExitCode complainAboutLoss(const std::string& name, const RedactedCopy& copy) {
     if (copy.unreachableStreams() == 0)
         return code;
     complain(fmt::format("{}: left out {} streams that readers do not find; 'zulm salvage {} -o DIR' writes them out",
-                         name, copy.unreachableStreams(), name));
+                         name, copy.unreachableStreams(), shellWord(name)));
     return ExitDamaged;
 }
 
@@ -109,7 +109,7 @@ ExitCode complainAboutDamage(const std::string& path, const std::string& output)
     if (!report.isDamaged())
         return ExitFine;
     complain(fmt::format("{}: what was damaged in the input still is in the copy; 'zulm verify {}' says what", output,
-                         output));
+                         shellWord(output)));
     return ExitDamaged;
 }
 

@@ -2,6 +2,7 @@
 
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/TemporaryFile.h"
+#include "Tools/zulm/Text.h"
 #include "ZULMetaData/AtomFormat.h"
 
 #include <fmt/core.h>
@@ -82,13 +83,15 @@ void RedactedCopy::requireWholeContainer() {
     const bool isMovie = container() == MetaDataParser::QuickTime;
     const RepairPlan plan = isMovie ? planRepair(recording_.parser().getStream()) : RepairPlan();
     if (plan.state == RepairPlan::Repairable)
-        throw Failure(fmt::format("{}: {}; 'zulm repair {} -o OUT' mends it first", name, plan.finding, name));
+        throw Failure(
+            fmt::format("{}: {}; 'zulm repair {} -o OUT' mends it first", name, plan.finding, shellWord(name)));
     const std::uint64_t end = items_.empty() ? 0 : items_.back().end();
     const bool fillsFile = end == total_ || (!isMovie && padded(end) == total_);
     if (plan.state == RepairPlan::Unrepairable || !fillsFile)
         throw Failure(fmt::format("{}: {}; 'zulm salvage {} -o DIR' writes out its streams, which can be redacted one "
                                   "by one",
-                                  name, plan.finding.empty() ? "its parts do not fill the file" : plan.finding, name));
+                                  name, plan.finding.empty() ? "its parts do not fill the file" : plan.finding,
+                                  shellWord(name)));
 }
 
 /// Metadata in a place that is copied as it is would stay in the copy.
@@ -104,7 +107,8 @@ void RedactedCopy::requireNothingHidden() {
         if (isKept(stream.offset))
             throw Failure(fmt::format("{}: {} at offset {} is outside of the metadata and would stay in the copy; "
                                       "'zulm salvage {} -o DIR' shows what it is",
-                                      recording_.name(), nameOf(stream.header.uuid), stream.offset, recording_.name()));
+                                      recording_.name(), nameOf(stream.header.uuid), stream.offset,
+                                      shellWord(recording_.name())));
         unreachable_ += stream.origin == SalvagedStream::Reachable ? 0 : 1;
     }
 }

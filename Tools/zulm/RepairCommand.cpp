@@ -1,6 +1,7 @@
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -43,10 +44,10 @@ void print(const RepairOptions& options, const Repair& repair) {
     const std::string& name = repair.output.empty() ? options.save.movie : repair.output;
     printRepair(name, repair.plan);
     if (repair.plan.state == RepairPlan::Whole)
-        writeOutput(fmt::format("{}: nothing to repair\n", name));
+        writeOutput(fmt::format("{}: nothing to repair\n", shown(name)));
     else if (repair.plan.state == RepairPlan::Repairable)
-        writeOutput(
-            fmt::format("{}: {}\n", name, options.dryRun ? "would be repaired; nothing was changed" : "repaired"));
+        writeOutput(fmt::format("{}: {}\n", shown(name),
+                                options.dryRun ? "would be repaired; nothing was changed" : "repaired"));
 }
 
 void report(const RepairOptions& options, const Repair& repair) {

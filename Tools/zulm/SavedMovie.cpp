@@ -3,6 +3,7 @@
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <fmt/core.h>
@@ -154,13 +155,13 @@ void requireMovie(const std::string& path) {
 std::string unrepairableText(const std::string& path, const RepairPlan& plan) {
     return fmt::format("{}: {}; nothing that is put behind it could be found. 'zulm salvage {} -o DIR' writes out "
                        "what metadata there is",
-                       path, plan.finding, path);
+                       path, plan.finding, shellWord(path));
 }
 
 void printRepair(const std::string& path, const RepairPlan& plan) {
     if (plan.state == RepairPlan::Whole)
         return;
-    writeOutput(fmt::format("{}: {}\n", path, plan.finding));
+    writeOutput(fmt::format("{}: {}\n", shown(path), plan.finding));
     for (const RepairChange& change : plan.changes)
         writeOutput(fmt::format("  offset {}: {} -> {}  {}\n", change.offset, hexText(change.before),
                                 change.after.empty() ? "(cut off)" : hexText(change.after), change.reason));
@@ -186,7 +187,7 @@ ExitCode complainAboutLoss(const std::string& path, const RepairPlan& plan) {
         return ExitFine;
     complain(fmt::format("{}: {}; part of it never got into the movie. 'zulm salvage {} -o DIR' writes out what "
                          "can be found",
-                         path, plan.finding, path));
+                         path, plan.finding, shellWord(path)));
     return ExitDamaged;
 }
 

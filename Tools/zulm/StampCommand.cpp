@@ -1,6 +1,7 @@
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -21,7 +22,7 @@ struct StampOptions {
 void print(const std::string& name, const StampResult& stamped) {
     const CreatorAttributes& creator = stamped.info.creator;
     printRepair(name, stamped.repair);
-    writeOutput(fmt::format("{}: stamped as {} {} on version {}\n", name, creator.name(), creator.version(),
+    writeOutput(fmt::format("{}: stamped as {} {} on version {}\n", shown(name), creator.name(), creator.version(),
                             creator.platformVersion()));
 }
 

@@ -5,6 +5,8 @@
 #include <fmt/core.h>
 #include <nlohmann/json.hpp>
 
+#include <algorithm>
+#include <cstddef>
 #include <cstdint>
 
 namespace Zulm {
@@ -49,6 +51,27 @@ std::string validText(const std::string& bytes) {
     if (ZULMetaData::isUTF8(bytes))
         return bytes;
     return Json::parse(Json(bytes).dump(-1, ' ', false, Json::error_handler_t::replace)).get<std::string>();
+}
+
+std::string shellWord(const std::string& word) {
+    constexpr std::string_view plain = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789_-+=:,./@%";
+    if (!word.empty() && word.find_first_not_of(plain) == std::string::npos)
+        return word;
+    std::string quoted = "\"";
+    for (const char c : word)
+        quoted +=
+            std::string_view("\"\\$`").find(c) == std::string_view::npos ? std::string(1, c) : std::string{'\\', c};
+    return quoted + '"';
+}
+
+std::string shownLines(const std::string& text) {
+    std::string result;
+    for (std::size_t start = 0; start <= text.size();) {
+        const std::size_t end = std::min(text.find('\n', start), text.size());
+        result += (start == 0 ? "" : "\n") + shown(text.substr(start, end - start));
+        start = end + 1;
+    }
+    return result;
 }
 
 std::string base64(std::string_view bytes) {

@@ -16,6 +16,12 @@ std::string shown(const std::string& text);
 /// `bytes` as they are where they are UTF-8, else with U+FFFD in place of what is not.
 std::string validText(const std::string& bytes);
 
+/// As one word of a command that can be pasted into a shell: as it is, or quoted.
+std::string shellWord(const std::string& word);
+
+/// Line by line as `shown`.
+std::string shownLines(const std::string& text);
+
 std::string base64(std::string_view bytes);
 
 } // namespace Zulm

@@ -4,6 +4,7 @@
 #include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -46,15 +47,15 @@ std::string counted(std::uint64_t count, const char* one, const char* many) {
 void print(const std::string& name, const ValidationReport& report) {
     const auto findings = report.allFindings();
     for (const Finding& finding : findings)
-        writeOutput(fmt::format("{}: {}\n", name, findingText(finding)));
+        writeOutput(fmt::format("{}: {}\n", shown(name), findingText(finding)));
     if (const std::uint64_t unlisted = report.damageCount + report.noticeCount - findings.size(); unlisted > 0)
         writeOutput(
-            fmt::format("{}: {} not listed\n", name, counted(unlisted, "more finding is", "more findings are")));
+            fmt::format("{}: {} not listed\n", shown(name), counted(unlisted, "more finding is", "more findings are")));
     if (!report.isDamaged() && report.hasMetaData())
-        writeOutput(fmt::format("{}: ok ({}, {})\n", name, counted(report.streamCount, "stream", "streams"),
+        writeOutput(fmt::format("{}: ok ({}, {})\n", shown(name), counted(report.streamCount, "stream", "streams"),
                                 counted(report.wholeEntries, "entry", "entries")));
     else if (!report.isDamaged())
-        writeOutput(fmt::format("{}: no recording metadata\n", name));
+        writeOutput(fmt::format("{}: no recording metadata\n", shown(name)));
 }
 
 Json findingDocuments(const std::vector<Finding>& findings) {
@@ -100,9 +101,11 @@ Json fileDocument(const std::string& name, const ValidationReport& report) {
 void advise(const std::string& name, const ValidationReport& report) {
     const auto isOpenEnded = [](const Finding& finding) { return finding.code == FindingCode::OpenEndedAtom; };
     if (std::any_of(report.findings.begin(), report.findings.end(), isOpenEnded))
-        warn(fmt::format("{}: 'zulm repair --dry-run {}' says whether its last atom can be closed", name, name));
+        warn(fmt::format("{}: 'zulm repair --dry-run {}' says whether its last atom can be closed", name,
+                         shellWord(name)));
     if (!std::all_of(report.streams.begin(), report.streams.end(), std::mem_fn(&StreamReport::isReachable)))
-        warn(fmt::format("{}: 'zulm salvage {} -o DIR' writes out the streams that no reader finds", name, name));
+        warn(fmt::format("{}: 'zulm salvage {} -o DIR' writes out the streams that no reader finds", name,
+                         shellWord(name)));
 }
 
 ExitCode runVerify(const VerifyOptions& options) {
