@@ -68,7 +68,8 @@ std::string shownLines(const std::string& text) {
     std::string result;
     for (std::size_t start = 0; start <= text.size();) {
         const std::size_t end = std::min(text.find('\n', start), text.size());
-        result += (start == 0 ? "" : "\n") + shown(text.substr(start, end - start));
+        result += start == 0 ? "" : "\n";
+        result += shown(text.substr(start, end - start));
         start = end + 1;
     }
     return result;
