@@ -70,7 +70,8 @@ void printItem(const LayoutItem& entry, int depth) {
 }
 
 void print(const Recording& recording, const Layout& layout) {
-    writeOutput(fmt::format("{}: {}, {} bytes\n", shown(recording.name()), recording.container(), layout.fileSize));
+    writeOutput(
+        fmt::format("{}: {}, {} bytes\n", withoutControls(recording.name()), recording.container(), layout.fileSize));
     writeOutput(
         heading(fmt::format("  {:<12}  {:>16}  {:>16}  {:<10}  {}", "type", "offset", "size", "header", "stream")) +
         '\n');

@@ -118,7 +118,7 @@ const char* cutText(StreamExtent::End end) {
 
 void print(const std::string& name, const AttachResult& attached) {
     printRepair(name, attached.repair);
-    writeOutput(fmt::format("{}: {} stream{} attached\n", shown(name), attached.streams.size(),
+    writeOutput(fmt::format("{}: {} stream{} attached\n", withoutControls(name), attached.streams.size(),
                             attached.streams.size() == 1 ? "" : "s"));
     for (const AttachedStream& stream : attached.streams)
         writeOutput(fmt::format("  {:<23}  {:>9} {:<7}  {:>10} bytes\n", nameOf(stream.type), stream.entries,

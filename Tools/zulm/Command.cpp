@@ -21,7 +21,7 @@ namespace {
 /// `lead` goes in front, coloured where standard error is.
 void printLine(const std::string& lead, fmt::color color, const std::string& message) {
     const std::string shownLead = useColor(stderr) ? fmt::format(fmt::emphasis::bold | fg(color), "{}", lead) : lead;
-    const std::string line = fmt::format("{} {}\n", shownLead, shownLines(message));
+    const std::string line = fmt::format("{} {}\n", shownLead, withoutControls(message));
     std::fwrite(line.data(), 1, line.size(), stderr); // nobody can be told where even this fails
 }
 

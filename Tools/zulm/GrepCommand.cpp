@@ -80,7 +80,8 @@ private:
             document_["matches"].push_back(
                 {{"stream", stream.name()}, {"timestamp", numberDocument(time)}, {"text", text}});
         else
-            writeOutput(fmt::format("{}:{}:{:.6f}: {}\n", shown(input_.name()), stream.name(), time, shown(text)));
+            writeOutput(
+                fmt::format("{}:{}:{:.6f}: {}\n", withoutControls(input_.name()), stream.name(), time, shown(text)));
     }
 
     const GrepOptions& options_;

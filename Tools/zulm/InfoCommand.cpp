@@ -134,7 +134,7 @@ void printRow(const StreamInfo& stream) {
 
 void print(const FileInfo& file) {
     const std::string duration = file.duration ? fmt::format("{:.3f} s", *file.duration) : "duration not told";
-    writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", shown(file.name), file.container, duration,
+    writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", withoutControls(file.name), file.container, duration,
                             bytesText(file.layout.fileSize), file.streams.size(), file.streams.size() == 1 ? "" : "s"));
     if (!file.streams.empty())
         writeOutput(heading(fmt::format("  {:<23}  {:>9}  {:>10}  {:>10}  {:>8}  {:>10}  {:>7}  {}", "kind", "entries",

@@ -44,9 +44,9 @@ void print(const RepairOptions& options, const Repair& repair) {
     const std::string& name = repair.output.empty() ? options.save.movie : repair.output;
     printRepair(name, repair.plan);
     if (repair.plan.state == RepairPlan::Whole)
-        writeOutput(fmt::format("{}: nothing to repair\n", shown(name)));
+        writeOutput(fmt::format("{}: nothing to repair\n", withoutControls(name)));
     else if (repair.plan.state == RepairPlan::Repairable)
-        writeOutput(fmt::format("{}: {}\n", shown(name),
+        writeOutput(fmt::format("{}: {}\n", withoutControls(name),
                                 options.dryRun ? "would be repaired; nothing was changed" : "repaired"));
 }
 

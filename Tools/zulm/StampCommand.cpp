@@ -22,8 +22,8 @@ struct StampOptions {
 void print(const std::string& name, const StampResult& stamped) {
     const CreatorAttributes& creator = stamped.info.creator;
     printRepair(name, stamped.repair);
-    writeOutput(fmt::format("{}: stamped as {} {} on version {}\n", shown(name), creator.name(), creator.version(),
-                            creator.platformVersion()));
+    writeOutput(fmt::format("{}: stamped as {} {} on version {}\n", withoutControls(name), creator.name(),
+                            creator.version(), creator.platformVersion()));
 }
 
 void report(const StampOptions& options, const std::string& name, const StampResult& stamped) {

@@ -5,7 +5,6 @@
 #include <fmt/core.h>
 #include <nlohmann/json.hpp>
 
-#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 
@@ -31,19 +30,22 @@ std::string printable(std::string_view bytes) {
     return text;
 }
 
-std::string shown(const std::string& text) {
+std::string withoutControls(const std::string& bytes) {
     std::string result;
-    const std::string valid = validText(text);
-    for (std::size_t i = 0; i < valid.size(); ++i) {
-        const bool isControl = (valid[i] >= '\0' && valid[i] < ' ') || valid[i] == '\x7f';
-        if (isUpperControl(std::string_view(valid).substr(i))) {
-            result += escaped(valid[i + 1]);
+    for (std::size_t i = 0; i < bytes.size(); ++i) {
+        const bool isControl = (bytes[i] >= '\0' && bytes[i] < ' ') || bytes[i] == '\x7f';
+        if (isUpperControl(std::string_view(bytes).substr(i))) {
+            result += escaped(bytes[i + 1]);
             ++i;
         } else {
-            result += isControl ? escaped(valid[i]) : std::string(1, valid[i]);
+            result += isControl ? escaped(bytes[i]) : std::string(1, bytes[i]);
         }
     }
     return result;
+}
+
+std::string shown(const std::string& text) {
+    return withoutControls(validText(text));
 }
 
 std::string validText(const std::string& bytes) {
@@ -62,17 +64,6 @@ std::string shellWord(const std::string& word) {
         quoted +=
             std::string_view("\"\\$`").find(c) == std::string_view::npos ? std::string(1, c) : std::string{'\\', c};
     return quoted + '"';
-}
-
-std::string shownLines(const std::string& text) {
-    std::string result;
-    for (std::size_t start = 0; start <= text.size();) {
-        const std::size_t end = std::min(text.find('\n', start), text.size());
-        result += start == 0 ? "" : "\n";
-        result += shown(text.substr(start, end - start));
-        start = end + 1;
-    }
-    return result;
 }
 
 std::string base64(std::string_view bytes) {
