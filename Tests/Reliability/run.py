@@ -4,6 +4,7 @@ import argparse
 import concurrent.futures
 import importlib
 import pathlib
+import subprocess
 import sys
 import tempfile
 import time
@@ -32,8 +33,6 @@ CHECKS = {
     "mutation": "mutants of the stream core killed by the tests",
 }
 FULL_ONLY = {"mutation"}
-DOCUMENT = SOURCE / "Docs/reliability.md"
-FENCES = ("<!-- table begins -->", "<!-- table ends -->")
 
 
 def execute(name, arguments):
@@ -57,10 +56,8 @@ def table(outcomes):
 
 
 def document(text):
-    page = DOCUMENT.read_text(encoding="utf-8")
-    before, _, rest = page.partition(FENCES[0])
-    _, _, after = rest.partition(FENCES[1])
-    DOCUMENT.write_text(f"{before}{FENCES[0]}\n{text}\n{FENCES[1]}{after}", encoding="utf-8")
+    subprocess.run([sys.executable, SOURCE / "scripts/put_table.py", SOURCE / "Docs/reliability.md"], input=text,
+                   encoding="utf-8", check=True)
 
 
 def main():
@@ -81,6 +78,8 @@ def main():
             outcomes[name] = (name, result, seconds)
             print(f"{name}: {'holds' if result.holds() else 'FAILS'} ({result.cases} cases, {seconds:.0f} s)",
                   file=sys.stderr, flush=True)
+            for note in result.notes:
+                print(f"    {note}", file=sys.stderr)
             for failure in result.failures[:20]:
                 print(f"    {failure}", file=sys.stderr)
 

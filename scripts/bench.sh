@@ -1,0 +1,31 @@
+#!/usr/bin/env bash
+# Measures what a user does beside a raw baseline in the same run, and prints one table. Ends with 1 where a target is
+# missed by more than a tenth. Usage: scripts/bench.sh [TASK] [--document]
+# TASK measures only what has that text in its name; --document puts the table into Docs/performance.md.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+
+task=
+document=
+for argument in "$@"; do
+    case $argument in
+    --document) document=1 ;;
+    -*) echo "usage: scripts/bench.sh [TASK] [--document]" >&2 && exit 2 ;;
+    *) task=$argument ;;
+    esac
+done
+
+scripts/install.sh build media bench
+echo "== building" >&2
+cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF >/dev/null
+cmake --build --preset release --target zulm benchmarks >&2
+
+table=$(mktemp)
+trap 'rm -f "$table"' EXIT
+missed=0
+printf '| task | beside | measured | target | |\n|---|---|---|---|---|\n' | tee "$table"
+for benchmark in Append Read Scan Save List Image Load; do
+    "build/release/Benchmarks/${benchmark}Benchmark" "$task" | tee -a "$table" || missed=1
+done
+[ -z "$document" ] || python3 scripts/put_table.py Docs/performance.md <"$table"
+exit "$missed"
