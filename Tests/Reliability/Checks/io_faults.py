@@ -1,0 +1,167 @@
+"""Lets every system call of every command, and of a program that records, fail in every way that it can."""
+
+import dataclasses
+import os
+import pathlib
+import shutil
+
+from check import Result
+from faults import (OPEN_MOVIE, WHOLE_MOVIE, Fault, count_calls, files_in, is_crash, recording, run_with, small_streams,
+                    write_files)
+from recordings import HEADER, entry_ends, fast_folder, sized_atom
+
+# What fails, and at every how many calls behind the first it fails again.
+FAULTS = (("eio", 0), ("eio", 1), ("enospc", 0), ("enospc", 1), ("full", 0), ("eintr", 0), ("eintr", 2), ("short", 0),
+          ("short", 1))
+INVISIBLE = {"eintr", "short"}
+MESSAGES = ("Couldn't open output file for appending meta data: ", "Couldn't open meta data file: ",
+            "Found a non DATA atom mixed in the ZUL meta data", "Can't parse metadata. Unable to open file: ", "MetaDataReader<T>::parseFile - Version is larger ")
+
+
+@dataclasses.dataclass
+class Case:
+    name: str
+    arguments: list[str]  # run in the folder of the files
+    files: dict[str, bytes]
+    changed: str = ""     # the file that is changed in place
+
+
+def cases(streams):
+    files = {f"{kind}.dat": stream for kind, stream in streams.items()}
+    whole = {"Recording.mp4": recording(streams)}
+    damaged = {"Broken.mp4": recording(streams)[:-10]}
+    interrupted = {"Movie.mp4": WHOLE_MOVIE + sized_atom(b"ZULM", 0, recording(streams)[len(WHOLE_MOVIE) + 16:-10])}
+    movie = {"Movie.mp4": OPEN_MOVIE}
+    stamp = ["stamp", "Movie.mp4", "--creator", "Recorder", "--creator-version", "1.0"]
+    return [
+        Case("info", ["info", "Recording.mp4"], whole),
+        Case("dump", ["dump", "Recording.mp4"], whole),
+        Case("verify", ["verify", "Recording.mp4"], whole),
+        Case("extract", ["extract", "Recording.mp4", "-o", "out"], whole),
+        Case("attach a copy", ["attach", "Movie.mp4", *files, "-o", "Out.mp4"], movie | files),
+        Case("attach", ["attach", "Movie.mp4", *files, "--in-place"], movie | files, "Movie.mp4"),
+        Case("repair a copy", ["repair", "Movie.mp4", "-o", "Out.mp4"], interrupted),
+        Case("repair", ["repair", "Movie.mp4", "--in-place"], interrupted, "Movie.mp4"),
+        Case("stamp a copy", [*stamp, "-o", "Out.mp4"], movie),
+        Case("stamp", [*stamp, "--in-place"], movie, "Movie.mp4"),
+        Case("salvage", ["salvage", "Broken.mp4", "-o", "out"], damaged),
+        Case("redact", ["redact", "Recording.mp4", "--keys", "-o", "Out.mp4"], whole),
+        Case("convert", ["convert", "--to", "srt", "Recording.mp4", "-o", "Out.srt"], whole),
+    ]
+
+
+@dataclasses.dataclass
+class Outcome:
+    code: int
+    output: bytes
+    errors: str
+    files: dict[str, bytes]
+
+
+def perform(context, root, case, program, fault):
+    """Runs a case in a new folder. None where it crashes or hangs."""
+    folder = root / "work"
+    write_files(folder, case.files)
+    ended = run_with(context, fault, [program, *case.arguments], folder=folder)
+    files = files_in(folder)
+    shutil.rmtree(folder)
+    if is_crash(ended):
+        return None
+    return Outcome(ended.returncode, ended.stdout, ended.stderr.decode(errors="replace"), files)
+
+
+def calls_of(context, root, case, program, kind):
+    folder = root / "count"
+    write_files(folder, case.files)
+    calls = count_calls(context, kind, [program, *case.arguments], folder=folder)
+    shutil.rmtree(folder)
+    return calls
+
+
+def without_temporaries(files):
+    return {name: contents for name, contents in files.items() if not os.path.basename(name).startswith(".")}
+
+
+def says_which_file(case, errors, usual):
+    """A line that a run without faults does not have, with a file in front and a sentence behind it."""
+    names = [*case.files, *case.arguments, "standard output", "."]
+    lines = [line for line in errors.splitlines() if line not in usual]
+    return any(line.startswith(("zulm: " + name)) and len(line) > len(name) + 12 for line in lines for name in names)
+
+
+def is_undone(case, got):
+    """The inputs are what they were, as far as the message does not say otherwise."""
+    return all(got.files.get(name) == contents for name, contents in case.files.items()
+               if name != case.changed or "could not be made what it was" not in got.errors)
+
+
+def problem_of(case, fault, got, usual):
+    """What is wrong with how a faulted run ended, or nothing."""
+    is_usual = (got.code, got.output, got.files) == (usual.code, usual.output, usual.files)
+    if fault.kind in INVISIBLE:
+        return "" if is_usual and got.errors == usual.errors else "shows"
+    files, wanted = without_temporaries(got.files), without_temporaries(usual.files)
+    is_right = (got.code, got.output, files) == (usual.code, usual.output, wanted)
+    if is_right:
+        return "" if is_usual or case.name == "redact" or fault.again else "leaves a temporary file"
+    if got.code not in (1, 3):
+        return "gives another result"
+    if not says_which_file(case, got.errors, usual.errors):
+        return "does not say which file"
+    if got.code == 1 and not is_undone(case, got) and files != wanted:
+        return "leaves a changed input"
+    if any(wanted.get(name) != contents for name, contents in files.items() if name not in case.files):
+        return "leaves an output that is not whole"
+    return "leaves a temporary file" if got.files != files and not fault.again else ""
+
+
+def damage_of(case, fault, got, usual):
+    """The same for the program that records: its streams hold a beginning of what they should, its movie is kept."""
+    lines = got.output.decode().splitlines()
+    rows = {row[0]: row[1:] for line in lines if len(row := line.split()) == 5 and row[0].endswith(".dat")}
+    if fault.kind in INVISIBLE:
+        return "" if (got.code, got.output, got.files) == (usual.code, usual.output, usual.files) else "shows"
+    if got.code != 0 or len(rows) != 17:
+        return "does not come to its end"
+    if unknown := [line for line in (*lines, *got.errors.splitlines())
+                   if line.split()[0] not in rows and not line.startswith(MESSAGES)]:
+        return f"says {unknown[0]!r}"
+    for name, (healthy, written, right, _) in rows.items():
+        stream, whole = got.files.get(name, b""), usual.files[name]
+        if not whole.startswith(stream):
+            return f"writes something else into {name}"
+        entries = len(entry_ends(stream)) - 1 if len(stream) >= HEADER else 0
+        if healthy == "1" and (stream != whole or int(written) != entries):
+            return f"calls {name} healthy, which has {entries} entries"
+        if int(right) > len(entry_ends(whole)) - 1:
+            return f"reads more from {name} than there is"
+    (before,) = case.files.values()
+    movie = got.files["Movie.mp4"][:len(before)]
+    return "" if movie in (before, usual.files["Movie.mp4"][:len(before)]) else "changes the movie"
+
+
+def check_case(context, root, case, program, problem, result):
+    usual = perform(context, root, case, program, Fault("none"))
+    for kind, again in FAULTS:
+        for at in range(1, calls_of(context, root, case, program, kind) + 1):
+            fault = Fault(kind, at, again)
+            got = perform(context, root, case, program, fault)
+            result.cases += 1
+            if got is None:
+                result.crashed += 1
+                result.failures.append(f"{case.name}: {fault}: crashes or hangs")
+            elif found := problem(case, fault, got, usual):
+                result.lost += "input" in found or "movie" in found
+                result.failures.append(f"{case.name}: {fault}: {found}; ended {got.code}: {got.errors!r}")
+
+
+def run(context):
+    result = Result()
+    with fast_folder() as name:
+        root = pathlib.Path(name)
+        for case in cases(small_streams(context)):
+            check_case(context, root, case, context.zulm, problem_of, result)
+        entries = "20" if context.full else "2"
+        session = Case("recording", ["session", ".", entries], {"Movie.mp4": OPEN_MOVIE})
+        check_case(context, root, session, context.program("recorder"), damage_of, result)
+    return result
