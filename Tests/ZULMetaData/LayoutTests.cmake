@@ -1,3 +1,4 @@
 zulm_add_test(ZULMetaData/ContainerLayoutTest)
 zulm_add_test(ZULMetaData/ContainerRecognitionTest)
 zulm_add_test(ZULMetaData/MovieDurationTest)
+zulm_add_test(ZULMetaData/RecordingInfoTest)
