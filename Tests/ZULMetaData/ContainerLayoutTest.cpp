@@ -59,6 +59,13 @@ TEST(ContainerLayout, KnowsWhatHoldsMetaDataAndStreams) {
     EXPECT_TRUE(chunks[0].holdsMetaData());
 }
 
+TEST(ContainerLayout, KnowsWhatHoldsRecordingInfo) {
+    const auto atoms = itemsOf(extendedAtom("ZULR", std::string(64, '\0')) + atom("ZULM"));
+    ASSERT_EQ(atoms.size(), 2U);
+    EXPECT_TRUE(atoms[0].holdsRecordingInfo());
+    EXPECT_FALSE(atoms[1].holdsRecordingInfo());
+}
+
 TEST(ContainerLayout, GivesChunksWithoutTheirPadByte) {
     const auto chunks = itemsOf(chunk("RIFF", "odd") + chunk("junk", "even"), MetaDataParser::Riff);
     ASSERT_EQ(chunks.size(), 2U);

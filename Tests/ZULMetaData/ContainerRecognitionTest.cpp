@@ -21,6 +21,7 @@ TEST(ContainerRecognition, TakesASizeAndAPrintableTypeForAMovie) {
 TEST(ContainerRecognition, RefusesAtomsThatCannotBe) {
     EXPECT_EQ(streamTypeOfContents(be32(7) + "mdat"), Unknown);
     EXPECT_EQ(streamTypeOfContents(be32(16) + "\x01\x02\x03\x04"), Unknown);
+    EXPECT_EQ(streamTypeOfContents(be32(16) + "wid\x7f"), Unknown);
     EXPECT_EQ(streamTypeOfContents(be32(8) + "wid"), Unknown); // cut short
     EXPECT_EQ(streamTypeOfContents(""), Unknown);
     EXPECT_EQ(streamTypeOfContents(std::string(64, '\0')), Unknown);

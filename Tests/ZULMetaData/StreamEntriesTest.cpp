@@ -158,6 +158,13 @@ TEST(DecodeEntry, RefusesAListWhoseTextsDoNotFillIt) {
     EXPECT_FALSE(decodeEntry<std::list<std::string>>(listEntry(1, le32(7) + "1234567"), 1));
 }
 
+TEST(DecodeEntry, RefusesAListWhoseSizeDisagreesWithItsBytes) {
+    const std::string entry = listEntry(1, textEntry(5, "a"));
+    for (std::size_t length = 0; length < entry.size(); ++length)
+        EXPECT_FALSE(decodeEntry<std::list<std::string>>(entry.substr(0, length), 1)) << length;
+    EXPECT_FALSE(decodeEntry<std::list<std::string>>(entry + "x", 1));
+}
+
 std::string cursorEntry(std::uint32_t entrySize, std::uint32_t dataSize, const std::string& data) {
     return le32(entrySize) + f64(1.5) + le64(7) + le32(dataSize) + data;
 }

@@ -113,6 +113,13 @@ TEST(MetaDataValidator, ReadsVersionOneOfTheCursorImages) {
     EXPECT_EQ(report.wholeEntries, 2U);
 }
 
+TEST(MetaDataValidator, TakesAnImageOfNoBytesInVersionOneForWhole) {
+    const std::string entry = le32(28) + f64(1) + le64(7) + le32(8) + le32(1) + le32(2);
+    const ValidationReport report = validated(streamHeader(s_images, 1, 0) + entry, s_raw);
+    EXPECT_EQ(findingsOf(report), "");
+    EXPECT_EQ(report.wholeEntries, 1U);
+}
+
 // ---- the report ----
 
 TEST(MetaDataValidator, TellsWhatAStreamIs) {
@@ -438,6 +445,13 @@ TEST(MetaDataValidator, ThrowsWhereTheDeviceFails) {
         }
         int_type underflow() override { return bytesRead() >= 32 ? traits_type::eof() : WatchedBuffer::underflow(); }
     } buffer(locationStream());
+    std::istream stream(&buffer);
+    EXPECT_THROW(validateRecording(stream, s_raw), std::runtime_error);
+}
+
+TEST(MetaDataValidator, ThrowsForADeviceWithoutPositions) {
+    struct PositionlessBuffer final : std::streambuf {
+    } buffer;
     std::istream stream(&buffer);
     EXPECT_THROW(validateRecording(stream, s_raw), std::runtime_error);
 }

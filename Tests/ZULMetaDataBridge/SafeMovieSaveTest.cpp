@@ -126,6 +126,15 @@ TEST_F(SafeSave, AttachesStreamsFromMemory) {
     EXPECT_EQ(streamsInMovie(), streams);
 }
 
+TEST_F(SafeSave, ReadsNothingBehindTheEndOfMemory) {
+    const StreamSource::Bytes source = StreamSource::memory("abc", "loaded").open();
+    std::string bytes = "....";
+    EXPECT_EQ(source.read(1, bytes), 2U);
+    EXPECT_EQ(bytes, "bc..");
+    EXPECT_EQ(source.read(3, bytes), 0U);
+    EXPECT_EQ(source.read(4, bytes), 0U);
+}
+
 TEST_F(SafeSave, AttachesPartsOfAnotherRecording) {
     const std::string riff = stream("old.avi", riffMedia() + zulmChunk({locationStream(), appNameStream()}));
     const auto old = MetaDataParser::create(riff);
@@ -156,6 +165,14 @@ TEST_F(SafeSave, RefusesTwoStreamsOfOneKind) {
               (folder / "b.dat") + ": a second stream of the kind cursorLocation, beside " + (folder / "a.dat"));
     EXPECT_THAT(refusal([&] { SafeMovieSave(movie).attach(twice, SafeMovieSave::Existing::Supersede); }),
                 HasSubstr("a second stream"));
+}
+
+TEST_F(SafeSave, NamesAKindThatIsNotRegisteredByItsIdentifier) {
+    writeFile(movie, media());
+    const std::string bytes = streamHeader("2b7b6aff", 1, 12) + f64(1) + le32(2);
+    const auto twice = sources({stream("a.dat", bytes), stream("b.dat", bytes)});
+    EXPECT_THAT(refusal([&] { SafeMovieSave(movie).attach(twice); }),
+                HasSubstr("a second stream of the kind 2b7b6aff-7a1f-11e2-83d0-0017f200be7f, beside"));
 }
 
 TEST_F(SafeSave, RefusesAKindThatTheMovieHasUnlessItSupersedes) {
@@ -488,6 +505,28 @@ TEST_F(SafeSave, ReadsBackWhatItWrote) {
                 HasSubstr("does not hold what was written at offset 62"));
 }
 
+TEST_F(SafeSave, FindsOutThatAReaderWouldNotFindTheStream) {
+    writeFile(movie, media());
+    int calls = 0;
+    const auto damage = [&](std::uint64_t, std::uint64_t) { // somebody writes into the type of the stream's atom
+        if (++calls == 1)
+            std::fstream(movie, std::ios::binary | std::ios::in | std::ios::out).seekp(30 + 16 + 4).put('x');
+    };
+    EXPECT_THAT(refusal([&] { SafeMovieSave(movie, damage).attach(sources({stream("a.dat", locationStream())})); }),
+                HasSubstr("does not show its stream of the kind cursorLocation at offset 62 to a reader"));
+}
+
+TEST_F(SafeSave, FindsOutThatTheMovieIsGone) {
+    writeFile(movie, media());
+    const auto removal = [&](std::uint64_t, std::uint64_t) { std::filesystem::remove(movie); };
+    try {
+        SafeMovieSave(movie, removal).attach(sources({stream("a.dat", locationStream())}));
+        ADD_FAILURE() << "nothing noticed";
+    } catch (const SaveError& error) {
+        EXPECT_THAT(error.what(), HasSubstr("cannot be opened: No such file"));
+    }
+}
+
 // Trap: the scale factor ------------------------------------------------------------------------------------------
 
 TEST_F(SafeSave, ShowsTheScaleFactorThroughTheParserOfItsKind) {
@@ -547,6 +586,10 @@ TEST_F(SafeSave, PlansWithoutChangingAnything) {
     std::filesystem::permissions(movie, std::filesystem::perms::owner_read);
     EXPECT_EQ(SafeMovieSave(movie).plan().changes.size(), 1U);
     EXPECT_EQ(contentsOf(movie), openEndedMedia());
+}
+
+TEST_F(SafeSave, CannotPlanForAMovieThatIsMissing) {
+    EXPECT_THROW(SafeMovieSave(movie).plan(), SaveError);
 }
 
 TEST_F(SafeSave, RepairsOnceAndThenFindsNothingToDo) {

@@ -56,6 +56,42 @@ TEST(StreamSalvage, FindsStreamsBehindABrokenAtom) {
     EXPECT_EQ(bytesOf(file, streams[2]), locationStream());
 }
 
+TEST(StreamSalvage, TakesTheLengthFromADataAtomOfEitherForm) {
+    const std::string broken = be32(0x7fffffff) + "mdat" + "pictures";
+    for (const std::string& data : {atom("DATA", locationStream()), extendedAtom("DATA", locationStream()),
+                                    be32(2) + "DATA" + be64(0) + atom("DATA", locationStream())}) {
+        const auto streams = salvaged(broken + data + pointEntry(3, 7, 8)); // which is not the stream's
+        ASSERT_EQ(streams.size(), 1U);
+        EXPECT_EQ(streams[0].origin, Origin::Unreachable);
+        EXPECT_EQ(streams[0].bytes, 56U);
+        EXPECT_EQ(streams[0].declaredBytes, 56U);
+    }
+}
+
+TEST(StreamSalvage, FindsKindsWhoseValuesNobodyReads) {
+    const std::string broken = be32(0x7fffffff) + "mdat" + "pictures";
+    const std::string texts = textEntry(5, "a") + textEntry(5, "bc");
+    for (const std::string& stream :
+         {streamHeader("2b7b6a00", 1, 0) + textEntry(1, "miscellany"),
+          streamHeader("2b7b6a01", 1, 16) + f64(1) + f64(2), streamHeader("2b7b6a02", 1, 12) + f64(1) + raw(2),
+          streamHeader("2b7b6a04", 1, 0) + le32(static_cast<std::uint32_t>(4 + texts.size())) + le32(2) + texts}) {
+        const auto streams = salvaged(broken + stream);
+        ASSERT_EQ(streams.size(), 1U);
+        EXPECT_EQ(streams[0].bytes, stream.size());
+    }
+    EXPECT_TRUE(salvaged(broken + streamHeader("2b7b6a03", 1, 20) + std::string(20, '\0')).empty());
+    EXPECT_TRUE(salvaged(broken + streamHeader("2b7b6a03", 1, 16) + f64(-1e9) + f64(2)).empty());
+}
+
+TEST(StreamSalvage, EndsWhereTheDeviceFails) {
+    struct FailingBuffer final : std::stringbuf {
+        using std::stringbuf::stringbuf;
+        std::streamsize xsgetn(char*, std::streamsize) override { return 0; }
+    } buffer(media() + zulmAtom({locationStream()}));
+    std::istream file(&buffer);
+    EXPECT_TRUE(StreamSalvage(file, MetaDataParser::RawStream).run().streams.empty());
+}
+
 TEST(StreamSalvage, FindsStreamsBehindADataAtomThatCountsATornTail) {
     const std::string torn = be32(1) + "DATA" + be64(16 + 56 + 5) + locationStream(); // 5 bytes were left out
     const std::string file = media() + extendedAtom("ZULM", torn + extendedAtom("DATA", appNameStream()) +
