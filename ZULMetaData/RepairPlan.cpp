@@ -6,8 +6,10 @@
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <optional>
 #include <span>
+#include <system_error>
 #include <utility>
 
 namespace ZULMetaData {
@@ -93,6 +95,8 @@ private:
 
     void walk();
     void walkOver(const Atom& atom, std::uint64_t& position);
+    void endInsideHeader(std::uint64_t position);
+    bool beginsAppend(std::uint64_t position);
 
     void closeOpenEnd(const Atom& last, const Atom& previous);
     void closeInterruptedAppend(const Atom& last);
@@ -176,12 +180,8 @@ void Planner::walk() {
     Atom previous;
     for (std::uint64_t position = 0; position < total_ && plan_.state == RepairPlan::Whole;) {
         const auto atom = atomAt(position);
-        if (!atom) {
-            plan_ = {RepairPlan::Unrepairable, {}, {}, position, false};
-            plan_.finding = "the last " + bytesText(total_ - position) + ", from offset " + std::to_string(position) +
-                            " on, do not hold an atom's header";
-            return;
-        }
+        if (!atom)
+            return endInsideHeader(position);
         if (atom->hasOpenEnd())
             return closeOpenEnd(*atom, previous);
         if (atom->isExtended() && atom->size == 0)
@@ -189,6 +189,25 @@ void Planner::walk() {
         walkOver(*atom, position);
         previous = *atom;
     }
+}
+
+void Planner::endInsideHeader(std::uint64_t position) {
+    const bool isAppend = beginsAppend(position);
+    plan_.offset = position;
+    plan_.finding = "the last " + bytesText(total_ - position) + ", from offset " + std::to_string(position) + " on, " +
+                    (isAppend ? "begin an atom that was never appended" : "do not hold an atom's header");
+    if (isAppend)
+        change(position, {}, "The beginning of an atom that was never appended is cut off.");
+    else
+        plan_.state = RepairPlan::Unrepairable;
+}
+
+/// Whether the file ends inside the header that this library was writing behind the movie.
+bool Planner::beginsAppend(std::uint64_t position) {
+    const std::string rest = bytesAt(position, std::min(total_ - position, detail::s_extendedAtomHeaderSize));
+    return position > 0 && !rest.empty() &&
+           (text(detail::extendedAtomHeader(detail::s_metaDataAtom, 0)).starts_with(rest) ||
+            text(detail::extendedAtomHeader(detail::s_recordingInfoAtom, 0)).starts_with(rest));
 }
 
 void Planner::walkOver(const Atom& atom, std::uint64_t& position) {
@@ -315,7 +334,10 @@ void Planner::setAside(std::uint64_t begin) {
 } // namespace
 
 RepairPlan planRepair(std::istream& movie) {
-    return Planner(movie).plan();
+    RepairPlan plan = Planner(movie).plan();
+    if (movie.bad() || (movie.fail() && !movie.eof())) // what could not be read must not pass for what is not there
+        throw std::system_error(EIO, std::generic_category(), "cannot be read");
+    return plan;
 }
 
 } // namespace ZULMetaData

@@ -32,7 +32,7 @@ struct RepairPlan {
 };
 
 /// Reads the headers of the movie's atoms, and the entries of a stream whose append was interrupted. Clears the
-/// stream's state first.
+/// stream's state first. Throws `std::system_error` where reading fails.
 RepairPlan planRepair(std::istream& movie);
 
 } // namespace ZULMetaData

@@ -234,10 +234,24 @@ TEST(RepairPlan, MendsAnAppendThatWasInterruptedAtAnyByte) {
     }
 }
 
-TEST(RepairPlan, CannotMendAHeaderThatIsCutShort) {
-    const std::string movie = media() + interrupted("ZULM", "");
-    for (std::size_t length = 31; length < 46; ++length)
+TEST(RepairPlan, CutsOffTheHeaderOfAnAppendThatIsCutShort) {
+    for (const char* type : {"ZULM", "ZULR"}) {
+        const std::string movie = media() + interrupted(type, "");
+        for (std::size_t length = 31; length < 46; ++length) {
+            const RepairPlan plan = planFor(movie.substr(0, length));
+            EXPECT_EQ(plan.state, RepairPlan::Repairable) << length;
+            EXPECT_THAT(plan.finding, testing::HasSubstr("begin an atom that was never appended"));
+            EXPECT_FALSE(plan.hasLoss);
+            EXPECT_EQ(repaired(movie.substr(0, length)), media());
+        }
+    }
+}
+
+TEST(RepairPlan, CannotMendAnotherHeaderThatIsCutShort) {
+    const std::string movie = media() + interrupted("ZULX", "");
+    for (std::size_t length = 38; length < 46; ++length)
         expectUnrepairable(planFor(movie.substr(0, length)), 30, "do not hold an atom's header");
+    expectUnrepairable(planFor(media() + be32(1) + "ZULM" + be32(7)), 30, "do not hold an atom's header");
 }
 
 // Movies that are broken ------------------------------------------------------------------------------------------
