@@ -1,5 +1,6 @@
 #include "ZULMetaData/AtomFormat.h"
 #include "ZULMetaData/PositionedInput.h"
+#include "ZULMetaData/StreamBufferAccess.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <fstream>
@@ -20,7 +21,10 @@ bool overwrite(std::fstream& movie, std::uint64_t position, std::span<const char
     seekWritePos(movie, static_cast<std::int64_t>(position));
     movie.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
     movie.flush();
-    return movie.good();
+    if (movie.good())
+        return true;
+    detail::StreamBufferAccess::discardPut(*movie.rdbuf()); // half of it may be written: the rest would follow twice
+    return false;
 }
 
 /// Only the 32-bit size 1 announces an extended one here, unlike in the scan.

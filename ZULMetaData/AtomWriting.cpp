@@ -25,6 +25,8 @@ OpenAtom beginAtom(std::ofstream& movie, std::uint32_t type) {
 std::uint64_t endAtom(std::ofstream& movie, const OpenAtom& atom) {
     movie.flush(); // a disk that is full shows only now
     const std::int64_t end = toInt64(movie.tellp());
+    if (movie.fail()) // closing would write what stands in the buffer a second time
+        StreamBufferAccess::discardPut(*movie.rdbuf());
     movie.close();
     return static_cast<std::uint64_t>(end) - static_cast<std::uint64_t>(atom.start);
 }

@@ -28,6 +28,12 @@ public:
         (buffer.*&StreamBufferAccess::pbump)(static_cast<int>(count));
     }
 
+    /// Forgets what was put but not yet written out.
+    static void discardPut(std::streambuf& buffer) {
+        (buffer.*&StreamBufferAccess::pbump)(
+            static_cast<int>((buffer.*&StreamBufferAccess::pbase)() - (buffer.*&StreamBufferAccess::pptr)()));
+    }
+
     /// Takes `less` bytes off an empty put area until it is written out for the first time.
     static void shortenPutArea(std::streambuf& buffer, std::size_t less) {
         if (room(buffer) == capacity(buffer) && room(buffer) > less)

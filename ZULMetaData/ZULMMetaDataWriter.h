@@ -172,8 +172,11 @@ void MetaDataWriter<T, A, B>::write(double time, const T& value, bool flush) {
 
 template <StreamValue T, class A, class B>
 void MetaDataWriter<T, A, B>::close() {
-    if (stream.is_open())
-        stream.close();
+    if (!stream.is_open())
+        return;
+    if (stream.bad()) // part of the buffer may be on the disk: written again on closing, it would stand there twice
+        detail::StreamBufferAccess::discardPut(*stream.rdbuf());
+    stream.close();
 }
 
 } // namespace ZULMetaData

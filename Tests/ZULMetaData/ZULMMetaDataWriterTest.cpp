@@ -329,6 +329,17 @@ TEST_F(StreamWriter, FailsWhereTheLastBytesCannotBeWrittenOnClosing) {
     EXPECT_TRUE(writer.getStream().fail());
 }
 
+TEST_F(StreamWriter, WritesNothingTwiceWhereTheDiskHasRoomAgain) {
+    open();
+    {
+        FileSizeLimit limit(header.size() + 8);
+        write(true);
+    }
+    writer.close();
+    EXPECT_TRUE(writer.getStream().fail());
+    EXPECT_TRUE(stored() == header + entry.substr(0, 8));
+}
+
 TEST_F(StreamWriter, KeepsTheBeginningOfTheStreamWhereTheDiskFillsUp) {
     constexpr std::size_t room = 200000;
     FileSizeLimit limit(room);
