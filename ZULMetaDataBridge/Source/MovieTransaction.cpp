@@ -4,15 +4,17 @@
 
 namespace ZULMetaData {
 
-MovieTransaction::MovieTransaction(const FileLocation& movie) : file_(movie), oldSize_(file_.size()), end_(oldSize_) {}
+MovieTransaction::MovieTransaction(const FileLocation& movie) : file_(movie), kept_(file_.size()), end_(kept_) {}
 
 void MovieTransaction::apply(const std::vector<RepairChange>& changes) {
     for (const RepairChange& change : changes) {
         applied_.push_back(change);
-        if (change.after.empty())
-            file_.truncate(end_ = change.offset);
-        else
+        if (change.after.empty()) {
+            file_.truncate(change.offset);
+            kept_ = end_ = change.offset;
+        } else {
             file_.writeAt(change.offset, change.after);
+        }
         file_.sync();
     }
 }
@@ -36,13 +38,14 @@ std::uint64_t MovieTransaction::endAtom() {
 }
 
 void MovieTransaction::undo() {
-    file_.truncate(oldSize_);
+    file_.truncate(kept_);
     file_.sync(); // an open end put back too early would swallow what is still behind it
-    for (auto change = applied_.rbegin(); change != applied_.rend(); ++change)
-        file_.writeAt(change->offset, change->before);
-    file_.sync();
+    for (auto change = applied_.rbegin(); change != applied_.rend(); ++change) {
+        file_.writeAt(change->offset, change->before); // what was cut off comes back behind an end that is open again
+        file_.sync();
+    }
     applied_.clear();
-    end_ = oldSize_;
+    kept_ = end_ = file_.size();
 }
 
 } // namespace ZULMetaData

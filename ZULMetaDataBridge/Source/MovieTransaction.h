@@ -31,12 +31,12 @@ public:
     /// Returns when the atom's bytes, and after them its size, are on the disk. Gives that size.
     std::uint64_t endAtom();
 
-    /// Makes the movie byte for byte what it was.
+    /// Makes the movie byte for byte what it was. Interrupted at any point, it leaves a movie that can be repaired.
     void undo();
 
 private:
     DurableFile file_;
-    std::uint64_t oldSize_;
+    std::uint64_t kept_; ///< what is in front of what was appended
     std::uint64_t end_;
     std::uint64_t atomStart_ = 0;
     std::vector<RepairChange> applied_;
