@@ -1,22 +1,17 @@
-#include "Tools/zulm/CommandLine.h"
+#include "Tools/zulm/Commands.h"
 #include "Tools/zulm/StandardStreams.h"
+
+#include <new>
 
 using namespace Zulm;
 
-namespace {
-
-std::vector<CommandGroup> commandGroups() {
-    return {{"Look", {addInfoCommand, addAtomsCommand, addDumpCommand, addDiffCommand, addGrepCommand}},
-            {"Check and rescue", {addVerifyCommand, addRepairCommand, addSalvageCommand}},
-            {"Change", {addAttachCommand, addStampCommand, addRedactCommand}},
-            {"Convert", {addExtractCommand, addConvertCommand}},
-            {"Try", {addDemoCommand}}};
-}
-
-} // namespace
-
 int main(int argc, char** argv) {
-    secureStandardStreams();
-    const ExitCode code = runCommandLine(argc, argv, commandGroups());
-    return flushStandardOutput() ? code : ExitFailed;
+    try {
+        secureStandardStreams();
+        const ExitCode code = runCommandLine(argc, argv, commandGroups());
+        return flushStandardOutput() ? code : ExitFailed;
+    } catch (const std::bad_alloc&) { // before or behind the command, or while it complained of something else
+        complainAboutMemory();
+        return ExitFailed;
+    }
 }
