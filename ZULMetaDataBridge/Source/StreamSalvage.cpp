@@ -86,15 +86,20 @@ struct DataHeader {
     std::uint64_t payload = 0;
 };
 
+/// What is read at once of `size` bytes.
+std::size_t blockSizeFor(std::uint64_t size) {
+    return static_cast<std::size_t>(std::min<std::uint64_t>(size, s_blockSize));
+}
+
 /// What `before` ends with, in one of its three forms.
 std::optional<DataHeader> dataHeaderAtEndOf(std::string_view before) {
     using namespace detail;
     constexpr std::uint32_t type = swapInt(s_streamAtom); // as it is stored
     const std::size_t end = before.size();
-    const std::size_t chunk = end - s_chunkHeaderSize;
     if (end < s_chunkHeaderSize)
         return std::nullopt;
-    const std::size_t extended = end - s_extendedAtomHeaderSize;
+    const std::size_t chunk = end - s_chunkHeaderSize;
+    const std::size_t extended = end < s_extendedAtomHeaderSize ? 0 : end - s_extendedAtomHeaderSize;
     const auto without = [](std::uint64_t headerSize, std::uint64_t size) {
         return DataHeader{headerSize, size < headerSize ? 0 : size - headerSize};
     };
@@ -161,10 +166,11 @@ void StreamSalvage::findReachable() {
 }
 
 void StreamSalvage::search() {
-    std::string block(s_before + s_behind + s_blockSize, '\0');
+    const std::size_t blockSize = blockSizeFor(total_);
+    std::string block(s_before + s_behind + blockSize, '\0');
     std::size_t kept = 0; // of the block before, in front of what is read
     for (std::uint64_t position = 0; position < total_;) {
-        const std::size_t size = read_(position, {block.data() + kept, s_blockSize});
+        const std::size_t size = read_(position, {block.data() + kept, blockSize});
         if (size == 0)
             return;
         searchIn({block.data(), kept + size}, kept, position - kept);
@@ -285,7 +291,7 @@ void StreamSalvage::walk(SalvagedStream& stream, std::uint64_t limit) const {
 std::uint64_t StreamSalvage::nextItemIn(std::uint64_t begin, std::uint64_t end) const {
     const std::array marks{itemMark(detail::s_streamAtom), itemMark(detail::s_metaDataAtom),
                            itemMark(detail::s_recordingInfoAtom)};
-    std::string block(s_blockSize, '\0');
+    std::string block(blockSizeFor(end - std::min(begin, end)), '\0');
     for (std::uint64_t position = begin; position < end;) {
         const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(block.size(), end - position));
         const std::size_t size = read_(position, {block.data(), wanted});
