@@ -14,6 +14,7 @@ class Result:
     lost: int = 0     # cases in which something was lost that had to be kept
     crashed: int = 0  # cases that crashed, hung or made a sanitizer report
     failures: list[str] = dataclasses.field(default_factory=list)  # one sentence for each case that did not hold
+    notes: list[str] = dataclasses.field(default_factory=list)     # what a reader should know though the check holds
 
     def holds(self):
         return self.cases > 0 and not (self.lost or self.crashed or self.failures)

@@ -1,0 +1,148 @@
+"""Puts hostile numbers into every size field of movies, RIFF files and streams: whatever walks them ends soon."""
+
+import concurrent.futures
+import pathlib
+import struct
+import time
+
+import check
+import recordings
+
+NUMBERS = [0, 1, 2, 3, 4, 5, 6, 7, 8, 15, 16, 17, 23, 24, 2**31 - 1, 2**31, 2**31 + 1, 2**32 - 1, 2**32, 2**32 + 1,
+           2**62, 2**63 - 1, 2**63, 2**64 - 1]
+SECONDS = 1
+MANY = 1 << 20  # bytes of a file of nothing but small items
+COMMANDS = (["verify"], ["atoms"], ["info"], ["salvage", "--force", "-o"], ["repair", "--dry-run"])
+
+
+def with_number(contents, offset, form, number):
+    size = struct.calcsize(form)
+    return contents[:offset] + struct.pack(form, number) + contents[offset + size:]
+
+
+def numbers_for(form, offset):
+    """Those that fit; of 64 bits also ends that wrap around to the start, to the item itself and before it."""
+    wide = form.endswith("Q")
+    wrapping = [2**64 - offset, 2**64 - offset + 8, 2**64 - 8, 2**64 - 16, 2**63 - offset] if wide else [2**32 - 8, 2**32 - 16]
+    most = 2**64 if wide else 2**32
+    return sorted({number % most for number in wrapping} | {number for number in NUMBERS if number < most})
+
+
+def variants(name, contents, fields):
+    """`fields` maps a label to offset and form."""
+    stem, extension = name.split(".")
+    for label, (offset, form) in fields.items():
+        for number in numbers_for(form, offset):
+            yield f"{stem}-{label}-{number}.{extension}", with_number(contents, offset, form, number)
+
+
+def movie_fields(contents):
+    """Both forms of every atom's size: the short one in front, the extended one behind the type."""
+    fields, position = {}, 0
+    for label in ("ftyp", "mdat", "ZULM", "DATA", "DATA"):
+        position = contents.index(label.encode(), position + 1) - 4
+        number = sum(key.startswith(label) for key in fields)
+        fields[f"{label}{number}short"] = (position, ">I")
+        fields[f"{label}{number}long"] = (position + 8, ">Q")
+        position += 4
+    return fields
+
+
+def riff_fields(contents):
+    fields, position = {}, 0
+    for label in ("RIFF", "ZULM", "DATA", "DATA"):
+        position = contents.index(label.encode(), position)
+        fields[f"{label}{sum(key.startswith(label) for key in fields)}"] = (position + 4, "<I")
+        position += 4
+    return fields
+
+
+def stream_fields(kind, stream):
+    """Entry sizes in the header and in front of the entries, and what stands inside the first of them."""
+    fields = {"entries": (20, "<I")}
+    begin = recordings.HEADER
+    if struct.unpack_from("<I", stream, 20)[0] == 0:
+        fields["entry"] = (begin, "<I")
+    if kind == "systemData":
+        fields |= {"count": (begin + 4, "<I"), "text": (begin + 8, "<I")}
+    if kind == "cursorImage":
+        fields |= {"data": (begin + 20, "<I"), "image": (begin + 32, "<I")}
+    return fields
+
+
+def extended_movie(streams):
+    media = recordings.extended_atom(b"mdat", recordings.MEDIA)
+    return recordings.extended_atom(b"ftyp", b"mp42") + media + recordings.metadata_atom(streams)
+
+
+def crowds():
+    """Files of nothing but the smallest items, some of which end inside their own headers."""
+    for size in (4, 5, 6, 7, 8):
+        smallest = struct.pack(">I", size) + b"\0\0\0\0"[: size - 4]
+        yield f"crowd-of-{size}.mp4", smallest * (MANY // size)
+    yield "crowd-of-extended-8.mp4", struct.pack(">Q", 8) * (MANY // 8)
+    yield "crowd-of-extended-16.mp4", recordings.extended_atom(b"free") * (MANY // 16)
+    yield "crowd-in-metadata.mp4", recordings.extended_atom(b"ZULM", recordings.extended_atom(b"DATA") * (MANY // 16))
+    yield "crowd-of-metadata.mp4", recordings.extended_atom(b"ZULM") * (MANY // 16)
+    yield "crowd-of-chunks.avi", recordings.chunk(b"JUNK", b"x") * (MANY // 10)
+    yield "crowd-of-empty-chunks.avi", recordings.chunk(b"RIFF") * (MANY // 8)
+    yield "crowd-in-metadata.avi", recordings.chunk(b"ZULM", recordings.chunk(b"DATA", b"x") * (MANY // 10))
+
+
+def cases(streams):
+    two = [streams["cursorLocation"], streams["slideTitles"]]
+    plain = recordings.movie(two)
+    yield from variants("movie.mp4", plain, movie_fields(plain))
+    extended = extended_movie(two)
+    yield from variants("extended.mp4", extended, movie_fields(extended))
+    riff = recordings.riff(two)
+    yield from variants("riff.avi", riff, riff_fields(riff))
+    for kind, stream in streams.items():
+        yield from variants(f"{kind}.dat", stream, stream_fields(kind, stream))
+    yield from crowds()
+
+
+def run_tool(context, file, result):
+    """The five looks that a person would take at a broken file."""
+    for command in COMMANDS:
+        arguments = [*command, *([context.folder / "salvaged"] if command[-1] == "-o" else []), file]
+        if command[0] in ("atoms",) and file.suffix == ".dat" or command[0] == "repair" and file.suffix != ".mp4":
+            continue
+        started = time.monotonic()
+        done = check.run([context.zulm, *arguments], timeout=60)
+        seconds = time.monotonic() - started
+        result.cases += 1
+        result.crashed += done.returncode < 0
+        if done.returncode not in (0, 1, 3, 4):
+            result.failures.append(f"zulm {command[0]} {file.name} ends with {done.returncode}")
+        if seconds > SECONDS:
+            result.failures.append(f"zulm {command[0]} {file.name} takes {seconds:.1f} s")
+
+
+def run_library(context, files, result):
+    with recordings.fast_folder() as scratch:
+        done = check.run([context.program("hostile_sizes"), scratch, *files], timeout=600)
+    result.failures += done.stderr.decode(errors="replace").splitlines()
+    result.crashed += done.returncode != 0
+    if done.returncode == 0:
+        ran, demanding = map(int, done.stdout.split())
+        result.cases += ran
+        result.notes.append(f"in {demanding:,} of {ran:,} files a declared size, which readers believe, asks for more "
+                            "memory than twice the file and 16 MiB; the validator warns of each")
+
+
+def run(context):
+    streams = {kind: recordings.shortened(stream, 200) for kind, stream in recordings.demo_streams(context).items()}
+    folder = pathlib.Path(context.folder) / "files"
+    folder.mkdir()
+    files = []
+    for name, contents in cases(streams):
+        files.append(folder / name)
+        files[-1].write_bytes(contents)
+    result = check.Result()
+    with concurrent.futures.ThreadPoolExecutor(2) as pool:
+        library = pool.submit(run_library, context, files, result)
+        for file in files:
+            run_tool(context, file, result)
+        library.result()
+    return result

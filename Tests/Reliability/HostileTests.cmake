@@ -1,0 +1,32 @@
+# One half of the library once more, under sanitizers whatever the preset.
+function(zulm_add_sanitized_copy name original sanitizers)
+  get_target_property(sources ${original} SOURCES)
+  get_target_property(folder ${original} SOURCE_DIR)
+  list(TRANSFORM sources PREPEND ${folder}/ REGEX "^[^/]")
+  add_library(${name} STATIC EXCLUDE_FROM_ALL ${sources})
+  target_include_directories(${name} PUBLIC ${PROJECT_SOURCE_DIR})
+  target_compile_options(${name} PUBLIC
+    -fsanitize=${sanitizers} -fno-sanitize-recover=all -fno-omit-frame-pointer)
+  target_link_options(${name} PUBLIC -fsanitize=${sanitizers})
+  zulm_project_options(${name})
+endfunction()
+find_package(PNG REQUIRED)
+find_package(TIFF REQUIRED)
+zulm_add_sanitized_copy(sanitized_stream_core ZULMetaData address,undefined)
+zulm_add_sanitized_copy(sanitized_bridge ZULMetaDataBridge address,undefined)
+target_link_libraries(sanitized_bridge PUBLIC sanitized_stream_core PRIVATE PNG::PNG TIFF::TIFF)
+
+# zulm_add_hostile_program(NAME): NAME.cpp on the sanitized library. Sees every block of memory that is asked for.
+function(zulm_add_hostile_program name)
+  add_executable(${name} EXCLUDE_FROM_ALL
+    Reliability/Programs/${name}.cpp Reliability/Programs/Exercise.cpp Reliability/Programs/Watch.cpp)
+  target_link_libraries(${name} PRIVATE sanitized_bridge)
+  target_link_options(${name} PRIVATE LINKER:--wrap=malloc,--wrap=free)
+  zulm_project_options(${name})
+  set_target_properties(${name} PROPERTIES RUNTIME_OUTPUT_DIRECTORY ${CMAKE_CURRENT_BINARY_DIR}/Reliability)
+  add_dependencies(reliability_programs ${name})
+endfunction()
+zulm_add_hostile_program(bit_flips)
+zulm_add_hostile_program(truncations)
+zulm_add_hostile_program(hostile_sizes)
+zulm_add_reliability_program(large_movies large_movies.cpp)
