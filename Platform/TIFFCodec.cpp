@@ -11,6 +11,7 @@
 #include <cstring>
 #include <limits>
 #include <memory>
+#include <new>
 #include <utility>
 
 #if TIFFLIB_VERSION < 20221213
@@ -207,18 +208,32 @@ std::uint64_t memoryToDecode(TIFF* tiff, Extent extent, std::size_t encodedSize)
            2 * sizeof(std::uint64_t) * pieces;
 }
 
-// libtiff multiplies colours by a straight alpha, which loses them where alpha is small. It leaves them alone where
-// alpha is marked as premultiplied, so the handle (not the file) is told that it is. Gives whether it really is.
-bool markAlphaAsPremultiplied(TIFF* tiff) {
+// Of the channels behind the colours. Where there was no memory for them libtiff keeps their number alone, and stumbles
+// over it later.
+std::span<const std::uint16_t> extraSamples(TIFF* tiff) {
     std::uint16_t count = 0;
     std::uint16_t* kinds = nullptr;
     if (TIFFGetField(tiff, TIFFTAG_EXTRASAMPLES, &count, &kinds) != 1 || count == 0) {
+        return {};
+    }
+    if (!kinds) {
+        throw std::bad_alloc();
+    }
+    return {kinds, count};
+}
+
+// libtiff multiplies colours by a straight alpha, which loses them where alpha is small. It leaves them alone where
+// alpha is marked as premultiplied, so the handle (not the file) is told that it is. Gives whether it really is.
+bool markAlphaAsPremultiplied(TIFF* tiff) {
+    const auto kinds = extraSamples(tiff);
+    if (kinds.empty()) {
         return false;
     }
     const bool premultiplied = kinds[0] == EXTRASAMPLE_ASSOCALPHA;
-    std::vector<std::uint16_t> marked(kinds, kinds + count);
+    std::vector<std::uint16_t> marked(kinds.begin(), kinds.end());
     marked[0] = EXTRASAMPLE_ASSOCALPHA;
-    TIFFSetField(tiff, TIFFTAG_EXTRASAMPLES, count, marked.data());
+    TIFFSetField(tiff, TIFFTAG_EXTRASAMPLES, static_cast<int>(marked.size()), marked.data());
+    extraSamples(tiff);
     return premultiplied;
 }
 
