@@ -10,6 +10,7 @@
 #include "ZULMetaDataBridge/Source/MetaDataWriters/KeptReachable.h"
 
 #include <cstdint>
+#include <memory>
 #include <new>
 #include <utility>
 
@@ -30,9 +31,10 @@ public:
     void setup() override {
         release();
         entriesWritten_ = 0;
-        metaDataWriter_ = new StreamWriter;
+        std::unique_ptr<StreamWriter, Destroyer> writer(new StreamWriter);
         if (Release == StreamWriterRelease::Never)
-            keepReachable(metaDataWriter_);
+            keepReachable(writer.get());
+        metaDataWriter_ = writer.release();
         metaDataWriter_->init(utf8Path(metaDataFile()), Kind::type, Kind::version);
     }
 
@@ -65,12 +67,18 @@ protected:
     }
 
 private:
+    /// A stream writer's destructor is not virtual: for one that is of exactly this type.
+    struct Destroyer {
+        void operator()(StreamWriter* writer) const {
+            writer->StreamWriter::~StreamWriter();
+            ::operator delete(writer);
+        }
+    };
+
     void release() {
         StreamWriter* writer = std::exchange(metaDataWriter_, nullptr);
-        if (!writer || Release == StreamWriterRelease::Never)
-            return;
-        writer->StreamWriter::~StreamWriter(); // of exactly this type: a stream writer's destructor is not virtual
-        ::operator delete(writer);
+        if (writer && Release == StreamWriterRelease::WithWriter)
+            Destroyer()(writer);
     }
 
     StreamWriter* metaDataWriter_ = nullptr;
