@@ -26,6 +26,7 @@ std::string kindText(const uuid& type) {
     if (const MetaDataKind* kind = findMetaDataKind(type))
         return std::string(kind->name);
     std::ostringstream text;
+    text.exceptions(std::ios_base::badbit); // half an identifier is worse than std::bad_alloc
     text << type;
     return text.str();
 }
@@ -125,7 +126,7 @@ private:
     void verify(const std::vector<Candidate>& candidates);
     void compare(std::ifstream& movie, const Candidate& candidate);
     void read(const Candidate& candidate, std::uint64_t position, std::span<char> bytes) const;
-    void undo(const std::string& reason);
+    void undo(const char* reason);
     void advance(std::uint64_t bytes);
 
     FileLocation movie_;
@@ -231,11 +232,12 @@ StampResult Save::stamp(const ZCAPHeader& info) {
     return result;
 }
 
-void Save::undo(const std::string& reason) {
+void Save::undo(const char* reason) {
     try {
         transaction_.undo();
     } catch (const std::system_error& error) {
-        fail(reason + "; and it could not be made what it was: " + error.what(), SaveError::Reason::NotUndone);
+        fail(std::string(reason) + "; and it could not be made what it was: " + error.what(),
+             SaveError::Reason::NotUndone);
     }
 }
 

@@ -16,6 +16,7 @@ namespace ZULMetaData::detail {
 template <class... Parts>
 std::string sentence(const Parts&... parts) {
     std::ostringstream text;
+    text.exceptions(std::ios_base::badbit); // half a sentence is worse than std::bad_alloc
     text.precision(15);
     (text << ... << parts);
     return text.str();
