@@ -1,0 +1,92 @@
+"""Runs the test programs and a sample of the tool's commands under valgrind's memory checker.
+
+The programs are those of the dev preset, which scripts/reliability.sh builds. The short form runs the library's; those
+that do little but start the tool, whose process is not looked into, are left to the long form."""
+
+import concurrent.futures
+import re
+
+import check
+import recordings
+
+WORKERS = 2
+ERRORS_FOUND = 99
+MEMCHECK = ["valgrind", "--quiet", f"--error-exitcode={ERRORS_FOUND}", "--leak-check=full",
+            "--errors-for-leak-kinds=definite", "--trace-children=no"]
+
+# Tests that valgrind cannot run, and why.
+LEFT_OUT = {}
+
+
+def programs(context):
+    """The test programs, those of the library alone in the short form."""
+    found = sorted((context.build.with_name("dev") / "Tests").glob("*Test"))
+    return [program for program in found if context.full or not program.name.startswith("Tools.")]
+
+
+def complaint(name, done):
+    """What memcheck or the program itself complains of; None where both are content."""
+    text = done.stderr.decode(errors="replace")
+    if done.returncode == ERRORS_FOUND:
+        return f"{name}: " + " / ".join(re.findall(r"^==\d+== (\S.*)", text, re.M)[:6])
+    if re.search(r"^==\d+== \S", text, re.M) and "ERROR SUMMARY" in text:
+        return f"{name}: {text[:300]}"
+    return None
+
+
+def run_program(program, folder):
+    filter_out = ":".join(LEFT_OUT.get(program.name, {}))
+    done = check.run([*MEMCHECK, program, "--gtest_brief=1", f"--gtest_filter=-{filter_out}"], timeout=3000, cwd=folder)
+    tests = re.search(rb"(\d+) tests? from \d+ test suites? ran", done.stdout)
+    failed = re.findall(r"^\[  FAILED  \] (\S+)(?: \(|$)", done.stdout.decode(errors="replace"), re.M)
+    result = check.Result(cases=int(tests[1]) if tests else 0)
+    if reported := complaint(program.name, done):
+        result.crashed += 1
+        result.failures.append(reported)
+    elif done.returncode != 0:
+        what = ", ".join(sorted(set(failed))) or f"ended with {done.returncode}"
+        result.failures.append(f"{program.name}: fails under valgrind: {what}")
+    return result
+
+
+def commands(context):
+    """A sample of what the tool does: reading, writing, damage."""
+    streams = recordings.shortened_all(recordings.demo_streams(context), 3000)
+    folder = context.folder / "tool"
+    folder.mkdir()
+    (folder / "r.mp4").write_bytes(recordings.movie(streams.values()))
+    (folder / "torn.mp4").write_bytes(recordings.movie(streams.values())[:-1500])
+    (folder / "m.mp4").write_bytes(recordings.FILE_TYPE + b"\0\0\0\0mdat" + recordings.MEDIA)
+    (folder / "a.dat").write_bytes(streams["cursorLocation"])
+    return folder, [
+        ["info", "r.mp4"], ["atoms", "r.mp4"], ["dump", "--format", "ndjson", "r.mp4"], ["verify", "torn.mp4"],
+        ["grep", "e", "r.mp4"], ["extract", "r.mp4", "-o", "out"], ["salvage", "torn.mp4", "-o", "rescued"],
+        ["redact", "r.mp4", "--keys", "-o", "redacted.mp4"], ["attach", "m.mp4", "a.dat", "-o", "attached.mp4"],
+        ["repair", "m.mp4", "-o", "repaired.mp4"], ["diff", "r.mp4", "torn.mp4"],
+        ["stamp", "m.mp4", "-o", "s.mp4", "--creator", "C", "--creator-version", "1"],
+    ]
+
+
+def run_command(zulm, words, folder):
+    done = check.run([*MEMCHECK, zulm, *words], timeout=600, cwd=folder)
+    result = check.Result(cases=1)
+    if reported := complaint("zulm " + words[0], done):
+        result.crashed += 1
+        result.failures.append(reported)
+    elif done.returncode < 0:
+        result.failures.append(f"zulm {words[0]} was ended by signal {-done.returncode}")
+    return result
+
+
+def run(context):
+    folder, samples = commands(context)
+    zulm = context.build.with_name("dev") / "Tools/zulm/zulm"
+    jobs = [lambda program=program: run_program(program, context.folder) for program in programs(context)]
+    jobs += [lambda words=words: run_command(zulm, words, folder) for words in samples]
+    result = check.Result()
+    with concurrent.futures.ThreadPoolExecutor(WORKERS) as pool:
+        for part in pool.map(lambda job: job(), jobs):
+            result.cases += part.cases
+            result.crashed += part.crashed
+            result.failures += part.failures
+    return result
