@@ -9,11 +9,13 @@
 #include <fmt/core.h>
 
 #include <algorithm>
+#include <cstdio>
 #include <filesystem>
 #include <iterator>
 #include <memory>
 #include <new>
 #include <sstream>
+#include <string_view>
 #include <system_error>
 
 namespace Zulm {
@@ -75,7 +77,7 @@ ExitCode run(const Action& action) {
     } catch (const Failure& failure) {
         complain(failure.what());
     } catch (const std::bad_alloc&) {
-        complain("out of memory");
+        complainAboutMemory();
     } catch (const std::filesystem::filesystem_error& error) {
         complain(fmt::format("{}: {}", error.path1().string(), error.code().message()));
     } catch (const std::system_error& error) { // only output is written by what throws this
@@ -142,6 +144,11 @@ ExitCode runCommandLine(int argc, char** argv, const std::vector<CommandGroup>& 
     if (!format.empty())
         return generate(app, format);
     return chosen ? run(chosen) : refuse(app, "which command?");
+}
+
+void complainAboutMemory() noexcept {
+    constexpr std::string_view line = "zulm: out of memory\n";
+    std::fwrite(line.data(), 1, line.size(), stderr);
 }
 
 } // namespace Zulm
