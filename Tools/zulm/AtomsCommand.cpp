@@ -87,7 +87,7 @@ ExitCode showAtoms(const std::string& path, const AtomsOptions& options, Json& f
     if (recording.parser().getStreamType() == MetaDataParser::RawStream)
         throw Failure(
             fmt::format("{}: a bare stream has no atoms; 'zulm info {}' shows what it is", path, shellWord(path)));
-    const Layout layout = layoutOf(recording.parser());
+    const Layout layout = layoutOf(recording);
     for (const LayoutEnd& end : layout.ends)
         warn(fmt::format("{}: the walk ends at offset {}: {}", path, end.offset, end.reason));
     if (options.json)

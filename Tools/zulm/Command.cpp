@@ -1,5 +1,6 @@
 #include "Tools/zulm/Command.h"
 
+#include "SharedDependencies/EndianFile.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/Text.h"
 
@@ -69,9 +70,10 @@ void requireFile(const std::string& path, bool forWriting) {
         throw Failure(fmt::format("{}: {}", path, error.message()));
     if (!std::filesystem::is_regular_file(status))
         throw Failure(fmt::format("{}: not a regular file", path));
-    errno = 0;
     const auto mode = forWriting ? std::ios::in | std::ios::out : std::ios::in;
-    if (!std::fstream(path, mode | std::ios::binary).is_open())
+    std::fstream file;
+    ZULMetaData::fileOpen(file, path.c_str(), mode | std::ios::binary);
+    if (!file.is_open())
         throw Failure(fmt::format("{}: cannot be opened: {}", path, std::strerror(errno)));
 }
 

@@ -9,6 +9,8 @@
 #include <fmt/ranges.h>
 
 #include <algorithm>
+#include <cerrno>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -49,6 +51,7 @@ std::vector<HeldStream> heldStreams(Recording& recording, const std::vector<std:
     MetaDataParser& parser = recording.parser();
     parser.getStream().clear();
     const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(parser.getStream()));
+    requireRead(parser.getStream(), recording.name());
     std::vector<HeldStream> streams;
     for (const uuid& type : parser.getAvailableMetaDataUUIDs()) {
         const auto [offset, length] = parser.fileDataForUUID(type);
@@ -119,8 +122,10 @@ void requireFree(const std::vector<std::string>& outputs, bool force) {
 void writePart(const std::string& input, std::uint64_t offset, std::uint64_t size, const std::string& output,
                bool force) {
     OutputFile file(output, {input}, force);
-    std::ifstream from(input, std::ios::binary);
-    std::ofstream to(file.temporaryPath(), std::ios::binary);
+    std::ifstream from;
+    std::ofstream to;
+    fileOpen(from, input.c_str(), std::ios::binary);
+    fileOpen(to, file.temporaryPath().c_str(), std::ios::binary | std::ios::trunc);
     Progress progress("writing " + output, size);
     std::vector<char> piece(s_pieceSize);
     from.seekg(static_cast<std::streamoff>(offset));
@@ -133,7 +138,7 @@ void writePart(const std::string& input, std::uint64_t offset, std::uint64_t siz
     }
     to.close();
     if (!to)
-        throw Failure(fmt::format("{}: cannot be written", output));
+        throw Failure(fmt::format("{}: cannot be written: {}", output, std::strerror(errno)));
     file.commit();
 }
 

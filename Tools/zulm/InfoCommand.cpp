@@ -61,12 +61,16 @@ FileInfo inspect(const std::string& path) {
     const InputFile input(path);
     Recording recording(input.path(), input.name());
     const ValidationReport& validation = recording.validation();
+    const auto read = [&](auto value) {
+        requireRead(recording.parser().getStream(), input.name());
+        return value;
+    };
     return {input.name(),
             recording.container(),
-            movieDuration(recording.parser()),
+            read(movieDuration(recording.parser())),
             recording.streams(),
-            readRecordingInfo(recording.parser()),
-            layoutOf(recording.parser()),
+            read(readRecordingInfo(recording.parser())),
+            read(layoutOf(recording)),
             validation.allFindings(),
             validation.isDamaged()};
 }

@@ -1,5 +1,6 @@
 #include "Tools/zulm/Layout.h"
 
+#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
@@ -111,11 +112,13 @@ std::string LayoutItem::headerForm() const {
     return item.isExtended() ? "extended" : "32-bit";
 }
 
-Layout layoutOf(MetaDataParser& parser) {
+Layout layoutOf(Recording& recording) {
+    MetaDataParser& parser = recording.parser();
     Layout layout;
     std::istream& stream = parser.getStream();
     stream.clear();
     layout.fileSize = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+    requireRead(stream, recording.name());
     if (parser.getStreamType() != MetaDataParser::RawStream)
         layout.items = Walk(parser, layout).items(0, layout.fileSize, false);
     return layout;

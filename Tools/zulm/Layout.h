@@ -11,6 +11,8 @@
 
 namespace Zulm {
 
+class Recording;
+
 struct LayoutItem {
     ZULMetaData::ContainerItem item;
     bool isMetaData = false;                 ///< holds streams
@@ -37,7 +39,7 @@ struct Layout {
     std::vector<LayoutEnd> ends; ///< none where everything is filled; those inside metadata atoms too
 };
 
-/// None for a bare stream.
-Layout layoutOf(ZULMetaData::MetaDataParser& parser);
+/// No items for a bare stream. Throws `Failure` where the file cannot be read.
+Layout layoutOf(Recording& recording);
 
 } // namespace Zulm

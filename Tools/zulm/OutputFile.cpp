@@ -1,5 +1,6 @@
 #include "Tools/zulm/OutputFile.h"
 
+#include "SharedDependencies/EndianFile.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/TemporaryFile.h"
@@ -16,6 +17,8 @@
 #include <utility>
 
 namespace Zulm {
+
+using ZULMetaData::fileOpen;
 
 namespace {
 
@@ -35,9 +38,18 @@ std::unique_ptr<TemporaryFile> newTemporary(const fs::path& path) {
     }
 }
 
+/// Repeats a system call that a signal interrupted.
+template <class Call>
+int uninterrupted(Call call) {
+    int result = call();
+    while (result < 0 && errno == EINTR)
+        result = call();
+    return result;
+}
+
 void sync(const std::string& path) {
-    const int file = open(path.c_str(), O_RDONLY | O_CLOEXEC);
-    const bool synced = file >= 0 && fsync(file) == 0;
+    const int file = uninterrupted([&] { return open(path.c_str(), O_RDONLY | O_CLOEXEC); });
+    const bool synced = file >= 0 && uninterrupted([file] { return fsync(file); }) == 0;
     const int reason = errno;
     if (file >= 0)
         close(file);
@@ -66,8 +78,10 @@ const std::string& OutputFile::temporaryPath() const {
 }
 
 void OutputFile::copyFrom(const std::string& source) {
-    std::ifstream from(source, std::ios::binary);
-    std::ofstream to(temporaryPath(), std::ios::binary);
+    std::ifstream from;
+    std::ofstream to;
+    fileOpen(from, source.c_str(), std::ios::binary);
+    fileOpen(to, temporaryPath().c_str(), std::ios::binary | std::ios::trunc);
     Progress progress("copying " + source, fs::file_size(source));
     std::vector<char> piece(1 << 20);
     while (from.read(piece.data(), static_cast<std::streamsize>(piece.size())), from.gcount() > 0) {
@@ -91,7 +105,8 @@ void OutputFile::commit() {
 void writeWholeFile(const std::string& path, const std::string& contents, const std::vector<std::string>& inputs,
                     bool force) {
     OutputFile file(path, inputs, force);
-    std::ofstream stream(file.temporaryPath(), std::ios::binary);
+    std::ofstream stream;
+    fileOpen(stream, file.temporaryPath().c_str(), std::ios::binary | std::ios::trunc);
     stream.write(contents.data(), static_cast<std::streamsize>(contents.size()));
     stream.close();
     if (!stream)

@@ -52,6 +52,7 @@ Recording::Recording(std::string path, std::string name) : path_(std::move(path)
     if (!parser_)
         throw Failure(
             fmt::format("{}: not a movie (.mp4, .mov, .zcap), a RIFF file (.avi, .wav) or a stream (.dat)", name_));
+    requireRead(parser_->getStream(), name_);
     say(fmt::format("{}: {} with {} streams", name_, container(), parser_->getAvailableMetaDataUUIDs().size()));
 }
 
@@ -98,6 +99,11 @@ StreamInfo Recording::streamInfo(const uuid& type) {
     info.readableBytes = found->readableBytes;
     info.damage = damageIn(*found);
     return info;
+}
+
+void requireRead(const std::istream& stream, const std::string& name) {
+    if (stream.bad() || (stream.fail() && !stream.eof()))
+        throw Failure(fmt::format("{}: cannot be read", name));
 }
 
 std::string containerName(MetaDataParser::StreamType type) {

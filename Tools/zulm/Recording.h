@@ -9,6 +9,7 @@
 #include <nlohmann/json.hpp>
 
 #include <cstdint>
+#include <istream>
 #include <memory>
 #include <optional>
 #include <string>
@@ -28,6 +29,9 @@ struct StreamInfo {
     std::uint64_t readableBytes = 0; ///< header included: what a reader can be trusted with
     std::string damage;              ///< the first thing that is wrong with it, or empty
 };
+
+/// Throws `Failure` where reading or seeking has failed. What could not be read must not pass for what is not there.
+void requireRead(const std::istream& stream, const std::string& name);
 
 class Recording {
 public:
@@ -53,6 +57,7 @@ public:
     void readEntries(const StreamInfo& stream, ZULMetaData::DataStreamObserver<Value>& observer) {
         ZULMetaData::MetaDataReader<Value>::parseStream(observer, parser_->getStream(), stream.range.offset,
                                                         stream.readableBytes, -1);
+        requireRead(parser_->getStream(), name_);
     }
 
 private:

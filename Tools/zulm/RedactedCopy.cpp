@@ -9,6 +9,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cerrno>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
@@ -29,14 +30,14 @@ bool isZero(const std::vector<char>& bytes, std::size_t size) {
 }
 
 /// Appends a part of a file. What is zero is skipped, so that holes stay holes.
-void copyBytes(const ReadBytes& read, std::uint64_t offset, std::uint64_t size, std::ostream& output,
-               Progress& progress) {
+void copyBytes(const ReadBytes& read, const std::string& name, std::uint64_t offset, std::uint64_t size,
+               std::ostream& output, Progress& progress) {
     std::vector<char> piece(s_pieceSize);
     for (std::uint64_t left = size; left > 0;) {
         const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(left, piece.size()));
         const std::size_t got = read(offset + size - left, {piece.data(), wanted});
         if (got == 0)
-            throw Failure(fmt::format("the input cannot be read at offset {}", offset + size - left));
+            throw Failure(fmt::format("{}: cannot be read at offset {}", name, offset + size - left));
         if (isZero(piece, got))
             output.seekp(static_cast<std::streamoff>(got), std::ios::cur);
         else
@@ -52,11 +53,11 @@ void writeBytes(std::ostream& output, const std::array<char, size>& bytes) {
 }
 
 /// The file ends where it was written or skipped to.
-void finish(std::ofstream& output, const std::string& path) {
+void finish(std::ofstream& output, const std::string& path, const std::string& input) {
     const auto end = output.tellp();
     output.close();
     if (!output || end < 0)
-        throw Failure(fmt::format("{}: cannot be written", path));
+        throw Failure(fmt::format("{}: the copy cannot be written: {}", input, std::strerror(errno)));
     std::filesystem::resize_file(path, static_cast<std::uint64_t>(end));
 }
 
@@ -136,7 +137,8 @@ void RedactedCopy::write(const std::string& output) {
 }
 
 void RedactedCopy::writeStreams(const std::string& file) {
-    std::ofstream output(file, std::ios::binary);
+    std::ofstream output;
+    fileOpen(output, file.c_str(), std::ios::binary | std::ios::trunc);
     for (const HeldStream& held : heldStreams(recording_)) {
         const auto begin = static_cast<std::uint64_t>(output.tellp());
         const StreamSource source = StreamSource::part(recording_.path(), held.offset, held.present);
@@ -147,13 +149,14 @@ void RedactedCopy::writeStreams(const std::string& file) {
         if (stream.removal == RedactedStream::None)
             parts_.push_back({begin, static_cast<std::uint64_t>(output.tellp()) - begin});
     }
-    finish(output, file);
+    finish(output, file, recording_.name());
 }
 
 void RedactedCopy::writeMovie(const std::string& output, const std::string& streamFile) const {
-    std::ofstream file(output, std::ios::binary);
+    std::ofstream file;
+    fileOpen(file, output.c_str(), std::ios::binary | std::ios::trunc);
     writeItems(file);
-    finish(file, output);
+    finish(file, output, recording_.name());
     std::vector<StreamSource> sources;
     for (const Part& part : parts_)
         sources.push_back(StreamSource::part(streamFile, part.offset, part.size));
@@ -171,18 +174,20 @@ void RedactedCopy::writeRIFF(const std::string& output, const std::string& strea
         size += detail::s_chunkHeaderSize + padded(part.size);
     if (size > s_most32)
         throw Failure(fmt::format("{}: {} bytes of metadata are more than a chunk can hold", recording_.name(), size));
-    std::ofstream file(output, std::ios::binary);
+    std::ofstream file;
+    fileOpen(file, output.c_str(), std::ios::binary | std::ios::trunc);
     writeItems(file);
-    std::ifstream streams(streamFile, std::ios::binary);
+    std::ifstream streams;
+    fileOpen(streams, streamFile.c_str(), std::ios::binary);
     Progress progress("writing the metadata", size);
     if (!parts_.empty())
         writeBytes(file, detail::chunkHeader(detail::s_metaDataAtom, static_cast<std::uint32_t>(size)));
     for (const Part& part : parts_) {
         writeBytes(file, detail::chunkHeader(detail::s_streamAtom, static_cast<std::uint32_t>(part.size)));
-        copyBytes(readingFrom(streams), part.offset, part.size, file, progress);
+        copyBytes(readingFrom(streams), streamFile, part.offset, part.size, file, progress);
         file.seekp(static_cast<std::streamoff>(part.size % 2), std::ios::cur);
     }
-    finish(file, output);
+    finish(file, output, recording_.name());
 }
 
 /// All but the metadata, which leaves unused bytes where its place may not be given up.
@@ -192,7 +197,7 @@ void RedactedCopy::writeItems(std::ostream& output) const {
     for (std::size_t i = 0; i < items_.size(); ++i) {
         const ContainerItem& item = items_[i];
         if (!item.holdsMetaData())
-            copyBytes(read, item.offset, item.size, output, progress);
+            copyBytes(read, recording_.name(), item.offset, item.size, output, progress);
         else if (isBeforeMedia(i))
             writeBlank(output, item);
         if (container() == MetaDataParser::Riff)

@@ -33,7 +33,8 @@ const char* originText(SalvagedStream::Origin origin) {
 }
 
 SalvageReport search(const std::string& path) {
-    std::ifstream file(path, std::ios::binary);
+    std::ifstream file;
+    fileOpen(file, path.c_str(), std::ios::binary);
     Progress progress("searching " + path, std::filesystem::file_size(path));
     return StreamSalvage(file, MetaDataParser::streamTypeOf(path), [&](std::uint64_t done) { progress.moveTo(done); })
         .run();

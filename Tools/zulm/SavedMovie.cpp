@@ -91,7 +91,6 @@ SavedMovie::SavedMovie(const SaveOptions& options, const std::vector<std::string
     if (options.inPlace)
         requireFile(options.movie, true);
     requireRepairable(options.movie);
-    std::signal(SIGXFSZ, SIG_IGN); // a file that may not grow is a write that fails, and is undone
     if (options.inPlace) {
         catchSignals();
         return;

@@ -8,6 +8,7 @@
 
 #include <array>
 #include <cerrno>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -36,7 +37,8 @@ void secureStandardStreams() {
     for (const Stream stream : {Stream{STDIN_FILENO, O_WRONLY}, {STDOUT_FILENO, O_RDONLY}, {STDERR_FILENO, O_WRONLY}})
         if (fcntl(stream.descriptor, F_GETFD) < 0)
             if (open("/dev/null", stream.mode) != stream.descriptor)
-                std::abort(); // the lowest free number is the one that is missing
+                std::abort();      // the lowest free number is the one that is missing
+    std::signal(SIGXFSZ, SIG_IGN); // a file that may not grow is a write that fails, and is told
     std::setvbuf(stdout, s_outputBuffer.data(), isTerminal(stdout) ? _IOLBF : _IOFBF, s_outputBuffer.size());
 }
 

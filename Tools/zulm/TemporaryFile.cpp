@@ -34,7 +34,7 @@ extern "C" void removeTemporariesAndEnd(int signal) {
 }
 
 void watchSignals() {
-    for (const int signal : {SIGINT, SIGTERM, SIGHUP, SIGPIPE, SIGXFSZ})
+    for (const int signal : {SIGINT, SIGTERM, SIGHUP, SIGPIPE})
         if (std::signal(signal, removeTemporariesAndEnd) == SIG_IGN)
             std::signal(signal, SIG_IGN);
 }

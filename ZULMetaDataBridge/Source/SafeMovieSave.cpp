@@ -258,7 +258,11 @@ SafeMovieSave::SafeMovieSave(FileLocation movie, Progress progress)
 
 RepairPlan SafeMovieSave::plan() const {
     std::ifstream movie = openMovie(movie_);
-    return planRepair(movie);
+    try {
+        return planRepair(movie);
+    } catch (const std::system_error& error) {
+        throw SaveError(utf8Path(movie_), error.what());
+    }
 }
 
 RepairPlan SafeMovieSave::repair() const {

@@ -18,8 +18,10 @@ StreamSource::Bytes openPart(const FileLocation& location, std::uint64_t offset,
     auto file = std::make_shared<std::ifstream>();
     errno = 0;
     fileOpen(*file, utf8Path(location).c_str(), std::ios_base::binary);
-    if (!std::filesystem::is_regular_file(location) || !file->is_open())
-        throw std::system_error(errno != 0 ? errno : EINVAL, std::generic_category(), "cannot be opened");
+    const int reason = errno;
+    std::error_code ignored;
+    if (!std::filesystem::is_regular_file(location, ignored) || !file->is_open())
+        throw std::system_error(reason != 0 ? reason : EINVAL, std::generic_category(), "cannot be opened");
     const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(*file));
     const std::uint64_t begin = std::min(offset, total);
     return {std::min(length, total - begin), [file, begin](std::uint64_t position, std::span<char> bytes) {
