@@ -157,6 +157,20 @@ TEST(RepairPlan, LeavesEightBytesThatMayBeTheHeaderOfAnAtomThatWasCutShort) {
     expectUnrepairable(planForShortMovie(be32(5000000) + "moov"), 12 + s_4GiB, "but the file ends after 8");
 }
 
+TEST(RepairPlan, KnowsAnAtomByATypeOfLettersDigitsSpacesAndTheCopyrightSign) {
+    for (const char* type : {"moov", "UUID", "mp42", "URL ", "\xa9nam"})
+        expectUnrepairable(planForShortMovie(be32(5000000) + type), 12 + s_4GiB, "but the file ends after 8");
+    for (const char* other : {"moo`", "moo{", "moo@", "moo[", "moo/", "moo:"})
+        EXPECT_EQ(planForShortMovie(be32(5000000) + other).changes.size(), 1U) << other;
+}
+
+TEST(RepairPlan, TakesNothingForAppendedThatThisLibraryDoesNotAppend) {
+    const std::string last = hex("ffffffffffffffff");
+    for (const std::string& behind : {atom("free"), atom("ZULM", locationStream()), extendedAtom("mdat"),
+                                      be32(1) + "ZULM" + be64(15), be32(1) + "ZULM" + be64(17), be32(1) + "ZULM"})
+        expectUnrepairable(planForShortMovie(last, behind), 12 + s_4GiB, "without a readable type");
+}
+
 TEST(RepairPlan, LeavesWhatIsNeitherShortNorAppended) {
     expectUnrepairable(planForShortMovie(hex("ffffffffffffffff"), "junk and more junk"), 12 + s_4GiB,
                        "without a readable type");
@@ -201,6 +215,18 @@ TEST(RepairPlan, ChangesNothingButOneSizeWhereStreamsCannotBeFollowed) {
         const RepairPlan plan = planFor(media() + interrupted("ZULM", children));
         ASSERT_EQ(plan.changes.size(), 1U) << size;
         EXPECT_EQ(plan.changes[0].after, be64(16 + 72 + 72));
+        EXPECT_TRUE(plan.hasLoss);
+    }
+}
+
+TEST(RepairPlan, KeepsBytesThatAreNoStreamInAnInterruptedAppend) {
+    const std::string header = be32(1) + "DATA";
+    for (const std::string& child :
+         {extendedAtom("free", locationStream()), atom("DATA", locationStream()), header + be64(39) + locationStream(),
+          header + be64(0xfffffffffffffff0) + locationStream()}) {
+        const RepairPlan plan = planFor(media() + interrupted("ZULM", child));
+        ASSERT_EQ(plan.changes.size(), 1U) << child;
+        EXPECT_EQ(plan.changes[0].after, be64(16 + child.size()));
         EXPECT_TRUE(plan.hasLoss);
     }
 }
