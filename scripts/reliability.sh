@@ -9,5 +9,7 @@ scripts/install.sh build media test check reliability
 echo "== building" >&2
 cmake --preset release -DZULMETADATA_BUILD_TESTS=ON >/dev/null
 cmake --build --preset release --target zulm reliability_programs >&2
+cmake --preset dev >/dev/null # for valgrind
+cmake --build --preset dev >&2
 
 python3 Tests/Reliability/run.py --build build/release "$@"
