@@ -1,16 +1,16 @@
 """Puts hostile numbers into every size field of movies, RIFF files and streams: whatever walks them ends soon."""
 
-import concurrent.futures
 import pathlib
+import resource
 import struct
-import time
 
 import check
 import recordings
 
 NUMBERS = [0, 1, 2, 3, 4, 5, 6, 7, 8, 15, 16, 17, 23, 24, 2**31 - 1, 2**31, 2**31 + 1, 2**32 - 1, 2**32, 2**32 + 1,
            2**62, 2**63 - 1, 2**63, 2**64 - 1]
-SECONDS = 1
+SECONDS = 1     # of the processor: others may keep it busy
+SAMPLE = 6      # in the short form the tool is run on every so manieth file, and on all crowds
 MANY = 1 << 20  # bytes of a file of nothing but small items
 COMMANDS = (["verify"], ["atoms"], ["info"], ["salvage", "--force", "-o"], ["repair", "--dry-run"])
 
@@ -102,15 +102,21 @@ def cases(streams):
     yield from crowds()
 
 
+def processor_seconds():
+    """Of all programs that have been run to their end."""
+    used = resource.getrusage(resource.RUSAGE_CHILDREN)
+    return used.ru_utime + used.ru_stime
+
+
 def run_tool(context, file, result):
     """The five looks that a person would take at a broken file."""
     for command in COMMANDS:
         arguments = [*command, *([context.folder / "salvaged"] if command[-1] == "-o" else []), file]
         if command[0] in ("atoms",) and file.suffix == ".dat" or command[0] == "repair" and file.suffix != ".mp4":
             continue
-        started = time.monotonic()
+        before = processor_seconds()
         done = check.run([context.zulm, *arguments], timeout=60)
-        seconds = time.monotonic() - started
+        seconds = processor_seconds() - before
         result.cases += 1
         result.crashed += done.returncode < 0
         if done.returncode not in (0, 1, 3, 4):
@@ -140,9 +146,8 @@ def run(context):
         files.append(folder / name)
         files[-1].write_bytes(contents)
     result = check.Result()
-    with concurrent.futures.ThreadPoolExecutor(2) as pool:
-        library = pool.submit(run_library, context, files, result)
-        for file in files:
+    for number, file in enumerate(files):
+        if context.full or number % SAMPLE == 0 or file.name.startswith("crowd"):
             run_tool(context, file, result)
-        library.result()
+    run_library(context, files, result)
     return result
