@@ -262,6 +262,9 @@ struct TornStream {
     const char* name;
     std::string whole;
     std::string torn;
+
+    /// Else its bytes are shown, also those between its members that nobody has written.
+    friend std::ostream& operator<<(std::ostream& out, const TornStream& stream) { return out << stream.name; }
 };
 
 class TornTail : public SafeSave, public testing::WithParamInterface<TornStream> {
