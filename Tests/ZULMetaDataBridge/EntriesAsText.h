@@ -28,7 +28,8 @@ inline std::string asText(const Image& image) {
     for (const std::uint8_t byte : image.rgba()) {
         char digits[3];
         std::snprintf(digits, sizeof digits, "%02x", unsigned{byte});
-        text += (index++ % 4 == 0 ? " " : "") + std::string(digits);
+        text += index++ % 4 == 0 ? " " : "";
+        text += digits;
     }
     return text;
 }
