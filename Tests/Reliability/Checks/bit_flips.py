@@ -24,7 +24,7 @@ def files(context, folder):
 
 def flip(context, number, chosen, random_cases):
     with recordings.fast_folder() as scratch:
-        return check.run([context.program("bit_flips"), scratch, random_cases, number, *chosen], timeout=3600)
+        return check.run([context.program("bit_flips"), scratch, str(random_cases), str(number), *chosen], timeout=3600)
 
 
 def run(context):
