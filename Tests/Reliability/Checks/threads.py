@@ -5,14 +5,14 @@ import re
 import check
 from check import Result
 
-ROUNDS = {False: 20, True: 400}
+ROUNDS = {False: 100, True: 2000}
 
 
 def run_program(context):
     folder = context.folder / "threads"
     folder.mkdir()
-    return check.run([context.program("threads"), folder, ROUNDS[context.full]], timeout=1200,
-               environment={"TSAN_OPTIONS": "halt_on_error=0 exitcode=66"})
+    return check.run([context.program("threads"), folder, str(ROUNDS[context.full])], timeout=1200,
+                     environment={"TSAN_OPTIONS": "halt_on_error=0 exitcode=66"})
 
 
 def check_results(done, result):
