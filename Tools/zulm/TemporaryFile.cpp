@@ -26,9 +26,7 @@ struct Slot {
 std::array<Slot, 4> s_slots;
 
 extern "C" void removeTemporariesAndEnd(int signal) {
-    for (const Slot& slot : s_slots)
-        if (slot.isUsed)
-            unlink(slot.path.data());
+    removeTemporaryFiles();
     std::signal(signal, SIG_DFL);
     std::raise(signal);
 }
@@ -78,6 +76,12 @@ TemporaryFile::~TemporaryFile() {
 void TemporaryFile::release() {
     isReleased_ = true;
     forget(path_);
+}
+
+void removeTemporaryFiles() noexcept {
+    for (const Slot& slot : s_slots)
+        if (slot.isUsed)
+            unlink(slot.path.data());
 }
 
 } // namespace Zulm

@@ -25,4 +25,7 @@ private:
     bool isReleased_ = false;
 };
 
+/// All that there are, for when the program ends in the middle of something. Asks for no memory.
+void removeTemporaryFiles() noexcept;
+
 } // namespace Zulm
