@@ -71,7 +71,7 @@ class Tool:
 
 
 def commands(context):
-    streams = recordings.shortened_all(recordings.demo_streams(context), 3000)
+    streams = recordings.shortened_all(recordings.demo_streams(context), 1500)
     movie = recordings.movie(list(streams.values()))
     bare = recordings.FILE_TYPE + b"\0\0\0\0mdat" + recordings.MEDIA  # open-ended
     recorded = {"r.mp4": movie}

@@ -30,7 +30,7 @@ PRECOMPILED = "#include <gmock/gmock.h>\n#include <gtest/gtest.h>\n"
 READER = ["ZULMMetaDataReader", "MetaDataParser"]
 WRITER = ["ZULMMetaDataWriter", "CursorImageRecord"]
 CONTAINERS = ["ContainerScan", "ParserUtil", "MetaDataParser"]
-CURSORS = ["CursorImageSchema", "CursorImageRecord", "StreamEntries"]
+CURSORS = ["CursorImageSchema", "CursorImageRecord", "StreamEntries", "ZULMMetaDataWriter"]
 COVERED_BY = {
     "AtomFormat.h": ["ContainerScan", "MP4MetaData", "AtomRepair"],
     "AtomRepair.cpp": ["AtomRepair", "MetaDataParser"],
