@@ -273,6 +273,11 @@ TEST(RepairPlan, CutsOffTheHeaderOfAnAppendThatIsCutShort) {
     }
 }
 
+TEST(RepairPlan, TakesNothingForAnAppendThatNoMovieIsInFrontOf) {
+    for (const char* type : {"ZULM", "ZULR"})
+        expectUnrepairable(planFor(be32(1) + type), 0, "do not hold an atom's header");
+}
+
 TEST(RepairPlan, CannotMendAnotherHeaderThatIsCutShort) {
     const std::string movie = media() + interrupted("ZULX", "");
     for (std::size_t length = 38; length < 46; ++length)
