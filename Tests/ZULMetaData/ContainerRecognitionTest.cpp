@@ -16,6 +16,7 @@ TEST(ContainerRecognition, TakesASizeAndAPrintableTypeForAMovie) {
     EXPECT_EQ(streamTypeOfContents(extendedAtom("mdat")), QuickTime);
     EXPECT_EQ(streamTypeOfContents(be32(0) + "mdat"), QuickTime); // an open end
     EXPECT_EQ(streamTypeOfContents(be32(8) + "wide"), QuickTime);
+    EXPECT_EQ(streamTypeOfContents(be32(8) + "~ ~ "), QuickTime);
 }
 
 TEST(ContainerRecognition, RefusesAtomsThatCannotBe) {
