@@ -1,6 +1,10 @@
 #include "ZULMetaData/StreamExtent.h"
 
 #include "ZULMetaData/StreamEntries.h"
+#include "ZULMetaData/ZULMMetaDataParser.h"
+
+#include <cerrno>
+#include <system_error>
 
 namespace ZULMetaData {
 
@@ -17,6 +21,15 @@ void walkSizedEntries(StreamEntries& entries, StreamExtent& extent) {
         ++extent.entries;
     extent.wholeBytes = entries.wholeBytes();
     extent.end = entries.end();
+}
+
+/// A stream in memory refuses to be moved there; a file that refuses has failed.
+bool isBehindEnd(std::istream& input, std::uint64_t position) {
+    input.clear();
+    const std::int64_t size = ParserUtil::calcFileSize(input);
+    const bool isBehind = !input.fail() && size >= 0 && static_cast<std::uint64_t>(size) < position;
+    input.setstate(std::ios_base::failbit);
+    return isBehind;
 }
 
 } // namespace
@@ -41,10 +54,14 @@ std::optional<StreamExtent> measureStream(std::istream& input, std::uint64_t off
 }
 
 ReadBytes readingFrom(std::istream& input) {
-    return [&input](std::uint64_t position, std::span<char> bytes) {
+    return [&input](std::uint64_t position, std::span<char> bytes) -> std::size_t {
         input.clear();
         input.seekg(static_cast<std::streamoff>(position));
+        if (input.fail() && isBehindEnd(input, position))
+            return 0;
         input.read(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+        if (input.bad() || (input.fail() && !input.eof())) // what cannot be read must not pass for what is not there
+            throw std::system_error(EIO, std::generic_category(), "cannot be read");
         return static_cast<std::size_t>(input.gcount());
     };
 }

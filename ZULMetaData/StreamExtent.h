@@ -37,7 +37,8 @@ std::optional<StreamExtent> measureStream(const ReadBytes& read, std::uint64_t l
 /// The same for `length` bytes from `offset` on. Clears the input's state first.
 std::optional<StreamExtent> measureStream(std::istream& input, std::uint64_t offset, std::uint64_t length);
 
-/// What `input` holds, to be read at any position. Uses an input of the caller, which must outlive it.
+/// What `input` holds, to be read at any position. Uses an input of the caller, which must outlive it. Throws
+/// `std::system_error` where reading fails.
 ReadBytes readingFrom(std::istream& input);
 
 } // namespace ZULMetaData

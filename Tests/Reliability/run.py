@@ -86,7 +86,7 @@ def main():
     text = table([outcomes[name] for name in names])
     print(text)
     if arguments.document:
-        document(text)
+        document(f"This is what the last documented run, `{arguments.extent}`, printed.\n\n{text}")
     return 0 if all(result.holds() for _, result, _ in outcomes.values()) else 1
 
 

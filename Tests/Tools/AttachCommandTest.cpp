@@ -164,7 +164,7 @@ TEST_F(AttachCommand, ExaminesTheStreamsBeforeItCopiesTheMovie) {
         {stream("short.dat", "x"),
          "short.dat: too short for a stream: 1 bytes of a 24-byte header; nothing was written"},
         {stream("same.dat", locationStream()),
-         large + ": has a stream of the kind cursorLocation already, at offset 50; --replace puts another one in front "
+         large + ": has a stream of the kind cursorLocation already, at offset 198; --replace puts another one in front "
                  "of it; nothing was written"}};
     for (const auto& [file, message] : refused) {
         const ToolResult result =

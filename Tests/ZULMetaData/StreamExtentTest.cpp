@@ -7,8 +7,12 @@
 
 #include <gtest/gtest.h>
 
+#include <array>
+#include <cstddef>
 #include <sstream>
+#include <stdexcept>
 #include <string>
+#include <system_error>
 #include <vector>
 
 namespace ZULMetaData::Test {
@@ -98,6 +102,48 @@ TEST(StreamExtent, MeasuresAPartOfAnInputThatHasFailed) {
     const auto extent = measureStream(input, 5, 50);
     ASSERT_TRUE(extent);
     EXPECT_EQ(extent->wholeBytes, 40U);
+}
+
+/// Of a device that breaks when it is read (or moved) behind its first bytes.
+class BrokenDevice : public std::stringbuf {
+public:
+    BrokenDevice(const std::string& bytes, bool failsToMove)
+        : std::stringbuf(bytes, std::ios_base::in), failsToMove_(failsToMove) {}
+
+protected:
+    std::streamsize xsgetn(char* bytes, std::streamsize count) override {
+        if (gptr() - eback() >= s_whole)
+            throw std::runtime_error("broken");
+        return std::stringbuf::xsgetn(bytes, count);
+    }
+    pos_type seekpos(pos_type position, std::ios_base::openmode mode) override {
+        return failsToMove_ && position > s_whole ? pos_type(off_type(-1)) : std::stringbuf::seekpos(position, mode);
+    }
+
+private:
+    static constexpr std::ptrdiff_t s_whole = 24;
+    bool failsToMove_;
+};
+
+TEST(StreamExtent, IsNoneOfWhatCannotBeRead) {
+    for (const bool failsToMove : {false, true}) {
+        BrokenDevice device(appNameStream(), failsToMove);
+        std::istream input(&device);
+        const ReadBytes read = readingFrom(input);
+        std::array<char, 8> bytes{};
+        EXPECT_EQ(read(0, bytes), 8U);
+        EXPECT_THROW(read(32, bytes), std::system_error);
+        EXPECT_EQ(read(16, bytes), 8U) << "the next place may be whole";
+    }
+}
+
+TEST(StreamExtent, FindsNothingBehindTheEndOfMemory) {
+    std::istringstream input("12345678");
+    const ReadBytes read = readingFrom(input);
+    std::array<char, 8> bytes{};
+    EXPECT_EQ(read(4, bytes), 4U);
+    EXPECT_EQ(read(8, bytes), 0U);
+    EXPECT_EQ(read(9, bytes), 0U);
 }
 
 TEST(StreamExtent, TakesAnInputThatEndsEarlyForTorn) {

@@ -60,12 +60,12 @@ void complainAboutOldMovie(const std::string& path, const std::string& what, Str
 }
 
 /// Where the children of a metadata atom or chunk do not end where it does, not all of them were found.
-bool hasUnreachableStreams(MetaDataParser& parser) {
-    std::istream& stream = parser.getStream();
-    const bool isMovie = parser.getStreamType() == MetaDataParser::QuickTime;
-    stream.clear();
-    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
-    for (const ContainerItem& item : listTopLevel(stream, parser.getStreamType())) {
+bool hasUnreachableStreams(Recording& recording) {
+    std::istream& stream = recording.parser().getStream();
+    const MetaDataParser::StreamType container = recording.parser().getStreamType();
+    const bool isMovie = container == MetaDataParser::QuickTime;
+    const std::uint64_t total = recording.size();
+    for (const ContainerItem& item : listTopLevel(stream, container)) {
         if (item.type != "ZULM")
             continue;
         const auto children = (isMovie ? listAtoms : listChunks)(stream, item.payloadOffset(), item.end(), total);
@@ -85,8 +85,7 @@ void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
         if (options.replace && streams.types.contains(type))
             continue; // a stream file takes its place
         const auto [offset, length] = parser.fileDataForUUID(type);
-        parser.getStream().clear();
-        const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(parser.getStream()));
+        const std::uint64_t total = old.size();
         if (length < s_metaDataHeaderSize || length >= s_negativeLength) {
             complainAboutOldMovie(
                 options.from, fmt::format("{} at offset {} lies in an atom without room for it", nameOf(type), offset),
@@ -100,7 +99,7 @@ void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
                                   streams);
         streams.sources.push_back(StreamSource::part(options.from, offset, length));
     }
-    if (hasUnreachableStreams(parser))
+    if (hasUnreachableStreams(old))
         complainAboutOldMovie(options.from, "its metadata cannot be walked to the end", streams);
 }
 

@@ -91,8 +91,8 @@ bool haveSameBytes(Recording& left, const HeldStream& leftStream, Recording& rig
         return false;
     std::vector<char> leftPiece(1 << 18);
     std::vector<char> rightPiece(leftPiece.size());
-    const ReadBytes readLeft = readingFrom(left.parser().getStream());
-    const ReadBytes readRight = readingFrom(right.parser().getStream());
+    const ReadBytes readLeft = left.bytes();
+    const ReadBytes readRight = right.bytes();
     for (std::uint64_t done = 0; done < leftStream.present;) {
         const auto wanted =
             static_cast<std::size_t>(std::min<std::uint64_t>(leftPiece.size(), leftStream.present - done));

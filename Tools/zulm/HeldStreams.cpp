@@ -49,9 +49,7 @@ std::string checkKind(const std::string& kind) {
 
 std::vector<HeldStream> heldStreams(Recording& recording, const std::vector<std::string>& kinds) {
     MetaDataParser& parser = recording.parser();
-    parser.getStream().clear();
-    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(parser.getStream()));
-    requireRead(parser.getStream(), recording.name());
+    const std::uint64_t total = recording.size();
     std::vector<HeldStream> streams;
     for (const uuid& type : parser.getAvailableMetaDataUUIDs()) {
         const auto [offset, length] = parser.fileDataForUUID(type);
@@ -62,7 +60,7 @@ std::vector<HeldStream> heldStreams(Recording& recording, const std::vector<std:
 }
 
 StreamEntries entriesOf(Recording& recording, const HeldStream& stream) {
-    const ReadBytes read = readingFrom(recording.parser().getStream());
+    const ReadBytes read = recording.bytes();
     return ZULMetaData::entriesOf(
         [read, offset = stream.offset](std::uint64_t position, std::span<char> bytes) {
             return read(offset + position, bytes);

@@ -115,10 +115,7 @@ std::string LayoutItem::headerForm() const {
 Layout layoutOf(Recording& recording) {
     MetaDataParser& parser = recording.parser();
     Layout layout;
-    std::istream& stream = parser.getStream();
-    stream.clear();
-    layout.fileSize = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
-    requireRead(stream, recording.name());
+    layout.fileSize = recording.size();
     if (parser.getStreamType() != MetaDataParser::RawStream)
         layout.items = Walk(parser, layout).items(0, layout.fileSize, false);
     return layout;

@@ -56,6 +56,21 @@ Recording::Recording(std::string path, std::string name) : path_(std::move(path)
     say(fmt::format("{}: {} with {} streams", name_, container(), parser_->getAvailableMetaDataUUIDs().size()));
 }
 
+std::uint64_t Recording::size() {
+    std::istream& stream = parser_->getStream();
+    stream.clear();
+    const std::int64_t size = ParserUtil::calcFileSize(stream);
+    if (size < 0 || stream.fail())
+        throw Failure(fmt::format("{}: cannot be read", name_));
+    return static_cast<std::uint64_t>(size);
+}
+
+ReadBytes Recording::bytes() {
+    return [read = readingFrom(parser_->getStream()), name = name_](std::uint64_t position, std::span<char> bytes) {
+        return orUnreadable(name, [&] { return read(position, bytes); });
+    };
+}
+
 std::string Recording::container() const {
     return containerName(parser_->getStreamType());
 }

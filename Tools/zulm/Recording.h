@@ -2,10 +2,13 @@
 
 // A file that holds metadata streams, opened for looking into it.
 
+#include "Tools/zulm/Command.h"
+#include "ZULMetaData/StreamExtent.h"
 #include "ZULMetaData/ZULMetaData.h"
 #include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
+#include <fmt/core.h>
 #include <nlohmann/json.hpp>
 
 #include <cstdint>
@@ -13,6 +16,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <system_error>
 #include <vector>
 
 namespace Zulm {
@@ -33,6 +37,16 @@ struct StreamInfo {
 /// Throws `Failure` where reading or seeking has failed. What could not be read must not pass for what is not there.
 void requireRead(const std::istream& stream, const std::string& name);
 
+/// Throws `Failure` in place of the `std::system_error` of a file that cannot be read.
+template <class Work>
+auto orUnreadable(const std::string& name, Work work) {
+    try {
+        return work();
+    } catch (const std::system_error& error) {
+        throw Failure(fmt::format("{}: cannot be read: {}", name, error.code().message()));
+    }
+}
+
 class Recording {
 public:
     /// Throws `Failure` for a file that cannot be opened or is no container by its name. `name` is what it is called
@@ -42,6 +56,12 @@ public:
     const std::string& path() const { return path_; }
     const std::string& name() const { return name_; }
     ZULMetaData::MetaDataParser& parser() { return *parser_; }
+
+    /// Of the file in bytes. Throws `Failure` where that cannot be told.
+    std::uint64_t size();
+
+    /// Its bytes at any position. Throws `Failure` where they cannot be read.
+    ZULMetaData::ReadBytes bytes();
 
     std::string container() const;
 

@@ -69,10 +69,9 @@ std::uint64_t padded(std::uint64_t size) {
 
 RedactedCopy::RedactedCopy(Recording& recording, const Redaction& redaction)
     : recording_(recording), redaction_(redaction) {
-    std::istream& stream = recording_.parser().getStream();
-    stream.clear();
-    total_ = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
-    items_ = listTopLevel(stream, container());
+    total_ = recording_.size();
+    items_ = listTopLevel(recording_.parser().getStream(), container());
+    requireRead(recording_.parser().getStream(), recording_.name());
     if (container() == MetaDataParser::RawStream)
         return;
     requireWholeContainer();
@@ -82,7 +81,8 @@ RedactedCopy::RedactedCopy(Recording& recording, const Redaction& redaction)
 void RedactedCopy::requireWholeContainer() {
     const std::string& name = recording_.name();
     const bool isMovie = container() == MetaDataParser::QuickTime;
-    const RepairPlan plan = isMovie ? planRepair(recording_.parser().getStream()) : RepairPlan();
+    const RepairPlan plan =
+        orUnreadable(name, [&] { return isMovie ? planRepair(recording_.parser().getStream()) : RepairPlan(); });
     if (plan.state == RepairPlan::Repairable)
         throw Failure(
             fmt::format("{}: {}; 'zulm repair {} -o OUT' mends it first", name, plan.finding, shellWord(name)));
@@ -100,7 +100,7 @@ void RedactedCopy::requireNothingHidden() {
     Progress progress("searching " + recording_.name(), total_);
     StreamSalvage salvage(recording_.parser().getStream(), container(),
                           [&progress](std::uint64_t done) { progress.moveTo(done); });
-    const SalvageReport report = salvage.run();
+    const SalvageReport report = orUnreadable(recording_.name(), [&] { return salvage.run(); });
     if (report.hasMore)
         throw Failure(fmt::format("{}: has more than {} places that look like streams; not all could be looked into",
                                   recording_.name(), SalvageReport::s_maximumStreams));
@@ -184,7 +184,8 @@ void RedactedCopy::writeRIFF(const std::string& output, const std::string& strea
         writeBytes(file, detail::chunkHeader(detail::s_metaDataAtom, static_cast<std::uint32_t>(size)));
     for (const Part& part : parts_) {
         writeBytes(file, detail::chunkHeader(detail::s_streamAtom, static_cast<std::uint32_t>(part.size)));
-        copyBytes(readingFrom(streams), streamFile, part.offset, part.size, file, progress);
+        orUnreadable(streamFile,
+                     [&] { copyBytes(readingFrom(streams), streamFile, part.offset, part.size, file, progress); });
         file.seekp(static_cast<std::streamoff>(part.size % 2), std::ios::cur);
     }
     finish(file, output, recording_.name());
@@ -193,7 +194,7 @@ void RedactedCopy::writeRIFF(const std::string& output, const std::string& strea
 /// All but the metadata, which leaves unused bytes where its place may not be given up.
 void RedactedCopy::writeItems(std::ostream& output) const {
     Progress progress("copying " + recording_.name(), total_);
-    const ReadBytes read = readingFrom(recording_.parser().getStream());
+    const ReadBytes read = recording_.bytes();
     for (std::size_t i = 0; i < items_.size(); ++i) {
         const ContainerItem& item = items_[i];
         if (!item.holdsMetaData())

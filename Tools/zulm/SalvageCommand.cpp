@@ -1,6 +1,7 @@
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/Progress.h"
+#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/StandardStreams.h"
 
@@ -36,8 +37,8 @@ SalvageReport search(const std::string& path) {
     std::ifstream file;
     fileOpen(file, path.c_str(), std::ios::binary);
     Progress progress("searching " + path, std::filesystem::file_size(path));
-    return StreamSalvage(file, MetaDataParser::streamTypeOf(path), [&](std::uint64_t done) { progress.moveTo(done); })
-        .run();
+    StreamSalvage salvage(file, MetaDataParser::streamTypeOf(path), [&](std::uint64_t done) { progress.moveTo(done); });
+    return orUnreadable(path, [&] { return salvage.run(); });
 }
 
 /// Of each kind the best comes first and gets the plain name.
