@@ -164,8 +164,9 @@ TEST_F(AttachCommand, ExaminesTheStreamsBeforeItCopiesTheMovie) {
         {stream("short.dat", "x"),
          "short.dat: too short for a stream: 1 bytes of a 24-byte header; nothing was written"},
         {stream("same.dat", locationStream()),
-         large + ": has a stream of the kind cursorLocation already, at offset 198; --replace puts another one in front "
-                 "of it; nothing was written"}};
+         large +
+             ": has a stream of the kind cursorLocation already, at offset 198; --replace puts another one in front "
+             "of it; nothing was written"}};
     for (const auto& [file, message] : refused) {
         const ToolResult result =
             runProgram("sh", {"-c", "ulimit -f 100; exec \"$0\" \"$@\"", ZULM_PATH, "attach", large, file, "-o", out});
