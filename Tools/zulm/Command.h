@@ -2,10 +2,11 @@
 
 // What the commands of `zulm` share: how they are added, how they end, and how they fail.
 
+#include "Tools/zulm/Failure.h"
+
 #include <CLI/CLI.hpp>
 
 #include <functional>
-#include <stdexcept>
 #include <string>
 #include <vector>
 
@@ -17,12 +18,6 @@ enum ExitCode : int {
     ExitUsage = 2,
     ExitDamaged = 3,    ///< done, but something is lost or damaged
     ExitNoMetaData = 4, ///< readable, but without recording metadata
-};
-
-/// Why a command could not do its work, in words for a person: "FILE: what is wrong; what to do about it".
-class Failure : public std::runtime_error {
-public:
-    using std::runtime_error::runtime_error;
 };
 
 /// Set by the command that was chosen, run after all options are read.

@@ -1,12 +1,12 @@
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Command.h"
+#include "Tools/zulm/DumpDocument.h"
 #include "Tools/zulm/EntryFormat.h"
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Recording.h"
-#include "Tools/zulm/Report.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
@@ -37,44 +37,12 @@ struct DumpOptions {
     bool covers(double time) const { return (!from || time >= *from) && (!to || time <= *to); }
 };
 
-/// What is between the brackets of an array that is printed as its elements come.
-class OpenArray {
-public:
-    /// Prints `document` up to the end of its last member, an empty array.
-    void begin(const Json& document) {
-        const std::string text = jsonLine(document);
-        writeOutput(std::string_view(text).substr(0, text.size() - 2));
-        isEmpty_ = true;
-    }
-    void add(const Json& element) {
-        separate();
-        writeOutput(jsonLine(element));
-    }
-    /// In front of an element that is printed otherwise.
-    void separate() {
-        writeOutput(isEmpty_ ? "\n" : ",\n");
-        isEmpty_ = false;
-    }
-    void end() { writeOutput("]}"); }
-
-private:
-    bool isEmpty_ = true;
-};
-
 /// Everything that one run prints, in its format.
 class Printout {
 public:
     Printout(const DumpOptions& options, const Recording& recording) : options_(options) {
-        if (options_.format != EntryFormat::JSON)
-            return;
-        Json report = reportHeader("dump");
-        report["files"] = Json::array();
-        files_.begin(report);
-        files_.separate();
-        Json file = fileHeader(recording.name());
-        file["container"] = recording.container();
-        file["streams"] = Json::array();
-        streams_.begin(file);
+        if (options_.format == EntryFormat::JSON)
+            document_.emplace(recording, writeOutput);
     }
 
     /// `keys` are those of its entries; none where these cannot be decoded.
@@ -87,14 +55,14 @@ public:
             writeOutput(fmt::format("{}stream,{}\n", hasTable_ ? "\n" : "", csvHeader(*keys)));
         hasTable_ |= keys != nullptr;
         if (options_.format == EntryFormat::JSON)
-            beginStreamDocument(stream);
+            document_->beginStream(stream, keys != nullptr);
     }
 
     void print(Json entry) {
         switch (options_.format) {
         case EntryFormat::Text: return writeOutput(textLine(entry) + '\n');
         case EntryFormat::CSV: return writeOutput(kind_ + ',' + csvLine(entry, *keys_) + '\n');
-        case EntryFormat::JSON: return entries_.add(entry);
+        case EntryFormat::JSON: return document_->add(entry);
         case EntryFormat::NDJSON: break;
         }
         Json line{{"stream", kind_}};
@@ -103,36 +71,21 @@ public:
     }
 
     void endStream() {
-        if (options_.format == EntryFormat::JSON && keys_)
-            entries_.end();
+        if (options_.format == EntryFormat::JSON)
+            document_->endStream();
     }
 
     void end() {
-        if (options_.format != EntryFormat::JSON)
-            return;
-        streams_.end();
-        files_.end();
-        writeOutput("\n");
+        if (options_.format == EntryFormat::JSON)
+            document_->end();
     }
 
 private:
-    void beginStreamDocument(const StreamInfo& stream) {
-        Json document{
-            {"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}, {"version", stream.version}};
-        document["entries"] = keys_ ? Json::array() : Json(nullptr);
-        if (!keys_)
-            return streams_.add(document);
-        streams_.separate();
-        entries_.begin(document);
-    }
-
     const DumpOptions& options_;
     std::string kind_;
     const EntryKeys* keys_ = nullptr;
     bool hasTable_ = false;
-    OpenArray files_;
-    OpenArray streams_;
-    OpenArray entries_;
+    std::optional<DumpDocument> document_;
 };
 
 /// Prints the entries of one stream as they are read.

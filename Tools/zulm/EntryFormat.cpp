@@ -6,7 +6,6 @@
 #include <fmt/core.h>
 #include <fmt/ranges.h>
 
-#include <charconv>
 #include <cmath>
 #include <string_view>
 #include <variant>
@@ -24,15 +23,6 @@ constexpr auto s_damage = "damage";
 constexpr auto s_image = "image";
 constexpr std::string_view s_storedSuffix = "_base64";
 
-/// The number with the fewest digits that is this one in 32 bits.
-Json shortestNumber(float value) {
-    if (!std::isfinite(value))
-        return numberDocument(value);
-    std::array<char, 64> digits{};
-    const auto end = std::to_chars(digits.data(), digits.data() + digits.size(), value).ptr;
-    return *realNumber(std::string(digits.data(), end));
-}
-
 Json document(std::int32_t value) {
     return value;
 }
@@ -40,7 +30,7 @@ Json document(std::int64_t value) { // more than a JSON number holds everywhere
     return std::to_string(value);
 }
 Json document(float value) {
-    return shortestNumber(value);
+    return std::isfinite(value) ? Json(shortestNumber(value)) : numberDocument(value);
 }
 Json document(const std::string& value) {
     return validText(value);

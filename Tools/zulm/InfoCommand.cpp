@@ -1,7 +1,7 @@
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/Findings.h"
+#include "Tools/zulm/InfoReport.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/Layout.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Report.h"
@@ -11,7 +11,6 @@
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <cmath>
 #include <iterator>
 #include <memory>
 
@@ -27,101 +26,14 @@ struct InfoOptions {
     bool json = false;
 };
 
-struct FileInfo {
-    std::string name;
-    std::string container;
-    std::optional<double> duration;
-    std::vector<StreamInfo> streams;
-    std::vector<ZCAPHeader> creators;
-    Layout layout;
-    std::vector<Finding> warnings;
-    bool isDamaged = false;
-};
-
 bool isDamage(const Finding& finding) {
     return finding.severity() == Severity::Damage;
-}
-
-/// Between the first and the last entry; none where they are at one time or at none.
-std::optional<double> entriesPerSecond(const StreamInfo& stream) {
-    if (!stream.firstTime || !stream.lastTime || stream.entries < 2)
-        return std::nullopt;
-    const double rate = static_cast<double>(stream.entries - 1) / (*stream.lastTime - *stream.firstTime);
-    return std::isfinite(rate) && rate > 0 ? std::optional(rate) : std::nullopt;
-}
-
-std::vector<LayoutItem> metaDataChildren(const Layout& layout) {
-    std::vector<LayoutItem> children;
-    for (const LayoutItem& item : layout.items)
-        children.insert(children.end(), item.children.begin(), item.children.end());
-    return children;
-}
-
-FileInfo inspect(const std::string& path) {
-    const InputFile input(path);
-    Recording recording(input.path(), input.name());
-    const ValidationReport& validation = recording.validation();
-    const auto read = [&](auto value) {
-        requireRead(recording.parser().getStream(), input.name());
-        return value;
-    };
-    return {input.name(),
-            recording.container(),
-            read(movieDuration(recording.parser())),
-            recording.streams(),
-            read(readRecordingInfo(recording.parser())),
-            read(layoutOf(recording)),
-            validation.allFindings(),
-            validation.isDamaged()};
 }
 
 ExitCode exitCodeFor(const FileInfo& file) {
     if (file.isDamaged)
         return ExitDamaged;
     return file.streams.empty() ? ExitNoMetaData : ExitFine;
-}
-
-Json streamDocument(const StreamInfo& stream) {
-    Json document{{"kind", kindDocument(stream.type)},
-                  {"uuid", uuidText(stream.type)},
-                  {"version", stream.version},
-                  {"entries", stream.isDecodable ? Json(stream.entries) : Json(nullptr)},
-                  {"first_time", numberDocument(stream.firstTime)},
-                  {"last_time", numberDocument(stream.lastTime)},
-                  {"entries_per_second", numberDocument(entriesPerSecond(stream))},
-                  {"offset", stream.range.offset},
-                  {"bytes", stream.range.length}};
-    if (!stream.damage.empty())
-        document["damage"] = stream.damage;
-    return document;
-}
-
-Json creatorDocument(const ZCAPHeader& info) {
-    return {{"name", info.creator.name()},
-            {"version", info.creator.version()},
-            {"platform_version", info.creator.platformVersion()}};
-}
-
-Json fileDocument(const FileInfo& file) {
-    Json document = fileHeader(file.name);
-    document.update(Json{{"container", file.container},
-                         {"bytes", file.layout.fileSize},
-                         {"duration", numberDocument(file.duration)},
-                         {"streams", Json::array()},
-                         {"creators", Json::array()},
-                         {"foreign_atoms", Json::array()},
-                         {"warnings", Json::array()}});
-    for (const StreamInfo& stream : file.streams)
-        document["streams"].push_back(streamDocument(stream));
-    for (const ZCAPHeader& creator : file.creators)
-        document["creators"].push_back(creatorDocument(creator));
-    for (const LayoutItem& child : metaDataChildren(file.layout))
-        if (child.isForeign)
-            document["foreign_atoms"].push_back(
-                {{"type", printable(child.item.type)}, {"offset", child.item.offset}, {"size", child.size}});
-    for (const Finding& finding : file.warnings)
-        document["warnings"].push_back(findingDocument(finding));
-    return document;
 }
 
 std::string numberText(const std::optional<double>& number, int digits) {
@@ -170,10 +82,12 @@ void warnOf(const FileInfo& file) {
 ExitCode runInfo(const InfoOptions& options) {
     Json files = Json::array();
     const ExitCode code = forEachFile(options.files, [&](const std::string& path) {
-        const FileInfo file = inspect(path);
+        const InputFile input(path);
+        Recording recording(input.path(), input.name());
+        const FileInfo file = inspect(recording);
         warnOf(file);
         if (options.json)
-            files.push_back(fileDocument(file));
+            files.push_back(infoDocument(file));
         else
             print(file);
         return exitCodeFor(file);

@@ -1,11 +1,8 @@
 #include "Tools/zulm/Recording.h"
 
-#include "Tools/zulm/Command.h"
-
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <iostream>
 #include <sstream>
 #include <stdexcept>
 
@@ -14,19 +11,6 @@ namespace Zulm {
 using namespace ZULMetaData;
 
 namespace {
-
-/// Keeps what is printed on a stream from being seen.
-class Muted {
-public:
-    explicit Muted(std::ostream& stream) : stream_(stream), buffer_(stream.rdbuf(nullptr)) {}
-    ~Muted() { stream_.rdbuf(buffer_); }
-    Muted(const Muted&) = delete;
-    Muted& operator=(const Muted&) = delete;
-
-private:
-    std::ostream& stream_;
-    std::streambuf* buffer_;
-};
 
 /// The first thing that is wrong, and how much else.
 std::string damageIn(const StreamReport& stream) {
@@ -41,19 +25,11 @@ std::string damageIn(const StreamReport& stream) {
 
 } // namespace
 
-Recording::Recording(std::string path, std::string name) : path_(std::move(path)), name_(std::move(name)) {
-    if (name_.empty())
-        name_ = path_;
-    requireFile(path_);
-    {
-        const Muted libraryMessages(std::cerr); // they name no file; the tool says the same in its own words
-        parser_ = MetaDataParser::create(path_);
-    }
+Recording::Recording(std::istream& input, MetaDataParser::StreamType type, std::string name) : name_(std::move(name)) {
+    parser_ = MetaDataParser::create(input, type);
     if (!parser_)
-        throw Failure(
-            fmt::format("{}: not a movie (.mp4, .mov, .zcap), a RIFF file (.avi, .wav) or a stream (.dat)", name_));
+        throw Failure(fmt::format("{}: cannot be read", name_));
     requireRead(parser_->getStream(), name_);
-    say(fmt::format("{}: {} with {} streams", name_, container(), parser_->getAvailableMetaDataUUIDs().size()));
 }
 
 std::uint64_t Recording::size() {
@@ -78,11 +54,15 @@ std::string Recording::container() const {
 const ValidationReport& Recording::validation() {
     try {
         if (!validation_)
-            validation_ = validateRecording(path_);
+            validation_ = validate();
     } catch (const std::runtime_error& error) {
         throw Failure(fmt::format("{}: {}", name_, error.what()));
     }
     return *validation_;
+}
+
+ValidationReport Recording::validate() {
+    return path_.empty() ? validateRecording(parser_->getStream(), parser_->getStreamType()) : validateRecording(path_);
 }
 
 std::vector<StreamInfo> Recording::streams() {

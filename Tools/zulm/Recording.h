@@ -2,7 +2,7 @@
 
 // A file that holds metadata streams, opened for looking into it.
 
-#include "Tools/zulm/Command.h"
+#include "Tools/zulm/Failure.h"
 #include "ZULMetaData/StreamExtent.h"
 #include "ZULMetaData/ZULMetaData.h"
 #include "ZULMetaDataBridge/Source/MetaDataValidator.h"
@@ -53,6 +53,10 @@ public:
     /// towards a person; its path where that is empty.
     explicit Recording(std::string path, std::string name = {});
 
+    /// Over an input of the caller that holds a container of this type, and that must outlive this.
+    Recording(std::istream& input, ZULMetaData::MetaDataParser::StreamType type, std::string name);
+
+    /// Empty for an input of the caller.
     const std::string& path() const { return path_; }
     const std::string& name() const { return name_; }
     ZULMetaData::MetaDataParser& parser() { return *parser_; }
@@ -81,6 +85,8 @@ public:
     }
 
 private:
+    ZULMetaData::ValidationReport validate();
+
     std::string path_;
     std::string name_;
     std::unique_ptr<ZULMetaData::MetaDataParser> parser_;

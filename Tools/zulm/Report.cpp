@@ -1,10 +1,8 @@
 #include "Tools/zulm/Report.h"
 
-#include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 
 #include <cmath>
-#include <utility>
 
 namespace Zulm {
 
@@ -14,10 +12,8 @@ Json reportHeader(const std::string& command) {
     return {{"schema", "zulm." + command}, {"schema_version", 1}, {"tool_version", ZULM_VERSION}};
 }
 
-void printReport(const std::string& command, Json files) {
-    Json report = reportHeader(command);
-    report["files"] = std::move(files);
-    writeOutput(report.dump(2, ' ', false, Json::error_handler_t::replace) + '\n');
+std::string reportText(const Json& document) {
+    return document.dump(2, ' ', false, Json::error_handler_t::replace);
 }
 
 Json fileHeader(const std::string& path) {

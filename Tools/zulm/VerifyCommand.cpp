@@ -1,10 +1,10 @@
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/Findings.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
+#include "Tools/zulm/VerifyReport.h"
 
 #include <fmt/core.h>
 
@@ -59,45 +59,6 @@ void print(const std::string& name, const ValidationReport& report) {
         writeOutput(fmt::format("{}: no recording metadata\n", withoutControls(name)));
 }
 
-Json findingDocuments(const std::vector<Finding>& findings) {
-    Json documents = Json::array();
-    for (const Finding& finding : findings)
-        documents.push_back(findingDocument(finding));
-    return documents;
-}
-
-Json streamDocument(const StreamReport& stream) {
-    return {{"kind", kindDocument(stream.type)},
-            {"uuid", uuidText(stream.type)},
-            {"version", stream.version},
-            {"fixed_entry_size", stream.fixedEntrySize},
-            {"offset", stream.offset},
-            {"declared_bytes", stream.declaredBytes},
-            {"present_bytes", stream.presentBytes},
-            {"readable_bytes", stream.readableBytes},
-            {"entries", stream.wholeEntries},
-            {"first_time", numberDocument(stream.firstTime)},
-            {"last_time", numberDocument(stream.lastTime)},
-            {"reachable", stream.isReachable},
-            {"findings", findingDocuments(stream.findings)}};
-}
-
-Json fileDocument(const std::string& name, const ValidationReport& report) {
-    Json document = fileHeader(name);
-    document.update(Json{{"container", containerName(report.container)},
-                         {"bytes", report.bytes},
-                         {"damaged", report.isDamaged()},
-                         {"damage_count", report.damageCount},
-                         {"notice_count", report.noticeCount},
-                         {"stream_count", report.streamCount},
-                         {"entries", report.wholeEntries},
-                         {"findings", findingDocuments(report.findings)},
-                         {"streams", Json::array()}});
-    for (const StreamReport& stream : report.streams)
-        document["streams"].push_back(streamDocument(stream));
-    return document;
-}
-
 /// What to run next.
 void advise(const std::string& name, const ValidationReport& report) {
     const auto isOpenEnded = [](const Finding& finding) { return finding.code == FindingCode::OpenEndedAtom; };
@@ -115,7 +76,7 @@ ExitCode runVerify(const VerifyOptions& options) {
         const InputFile input(path);
         const ValidationReport report = validate(input);
         if (options.json)
-            files.push_back(fileDocument(input.name(), report));
+            files.push_back(verifyDocument(input.name(), report));
         else
             print(input.name(), report);
         advise(input.name(), report);
