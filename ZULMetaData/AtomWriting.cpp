@@ -17,7 +17,8 @@ OpenAtom beginAtom(std::ofstream& movie, std::uint32_t type) {
     const auto header = extendedAtomHeader(type, 0);
     movie.write(header.data(), header.size());
     movie.flush();
-    const auto intoPage = static_cast<std::uint64_t>(start + static_cast<std::int64_t>(header.size())) % s_pageSize;
+    const auto intoPage = static_cast<std::size_t>(
+        static_cast<std::uint64_t>(start + static_cast<std::int64_t>(header.size())) % s_pageSize);
     StreamBufferAccess::shortenPutArea(*movie.rdbuf(), intoPage); // the blocks that follow end on page boundaries
     return {start, start < 0 ? start : start + static_cast<std::int64_t>(s_extendedSizeOffset)};
 }

@@ -4,9 +4,11 @@
 #include "ZULMetaData/InvalidEntry.h"
 #include "ZULMetaData/StreamBufferAccess.h"
 
+#include <algorithm>
 #include <cstddef>
 #include <cstring>
 #include <istream>
+#include <limits>
 #include <ostream>
 
 namespace ZULMetaData {
@@ -96,8 +98,9 @@ bool CursorImageReader::readField(std::istream& stream, const FieldInfo& field) 
 }
 
 void CursorImageReader::IgnoreLeftoverBytes(std::istream& stream, std::uint32_t count) {
-    if (count != 0)
-        stream.ignore(count);
+    constexpr std::uint32_t most = std::numeric_limits<std::int32_t>::max(); // that every `std::streamsize` holds
+    for (; count != 0 && stream.good(); count -= std::min(count, most))
+        stream.ignore(static_cast<std::streamsize>(std::min(count, most)));
 }
 
 namespace detail {
@@ -130,7 +133,8 @@ bool packEntry(Record& record, std::ostream& stream, int version) {
     std::uint64_t dataSize = 0; // may be more than its 32 bits on disk
     forEachField<s_baseInfoSteps>(record, version, [&](const FieldInfo& field) { baseSize += field.size; });
     forEachField<s_dataSteps>(record, version, [&](const FieldInfo& field) { dataSize += field.size; });
-    char* place = placeFor(stream, baseSize + dataSize);
+    const auto size = static_cast<std::size_t>(baseSize + dataSize); // too little only where there is no image
+    char* place = placeFor(stream, size);
     const bool outOfMemory = record.image.imageDataSize != 0 && !record.image.imageData;
     if (!place || outOfMemory)
         return false;
@@ -142,7 +146,7 @@ bool packEntry(Record& record, std::ostream& stream, int version) {
     };
     forEachField<s_baseInfoSteps>(record, version, pack);
     forEachField<s_dataSteps>(record, version, pack);
-    StreamBufferAccess::advancePut(*stream.rdbuf(), baseSize + dataSize);
+    StreamBufferAccess::advancePut(*stream.rdbuf(), size);
     return true;
 }
 

@@ -299,7 +299,7 @@ std::uint64_t Planner::endOfWholeStreams(const Atom& metaData) {
 bool Planner::beginsStreamAtom(std::uint64_t position) {
     const std::uint64_t left = total_ - position;
     const auto header = detail::extendedAtomHeader(detail::s_streamAtom, 0);
-    const std::uint64_t known = std::min<std::uint64_t>(left, detail::s_extendedSizeOffset);
+    const auto known = static_cast<std::size_t>(std::min<std::uint64_t>(left, detail::s_extendedSizeOffset));
     return left < s_smallestStreamAtom && bytesAt(position, known) == std::string(header.data(), known);
 }
 

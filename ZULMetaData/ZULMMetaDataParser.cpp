@@ -107,7 +107,8 @@ void MetaDataParser::loadAllData(std::map<uuid, std::string>& out) {
         bytes.clear();
         if (stream.peek() == std::istream::traits_type::eof())
             continue; // nothing there, or a directory, whose size means nothing
-        bytes.resize(std::min(range.length, total - std::min(range.offset, total)));
+        const std::uint64_t held = std::min(range.length, total - std::min(range.offset, total));
+        bytes.resize(static_cast<std::size_t>(std::min<std::uint64_t>(held, bytes.max_size())));
         stream.read(bytes.data(), static_cast<std::streamsize>(bytes.size()));
         bytes.resize(static_cast<std::size_t>(stream.gcount()));
     }

@@ -288,7 +288,7 @@ void StreamWalk::checkText(std::uint64_t size) {
     std::array<char, 16384> piece;
     std::size_t held = 0; // bytes of a character that the last piece cut
     while (size > 0) {
-        const auto count = std::min<std::uint64_t>(size, piece.size() - held);
+        const auto count = static_cast<std::size_t>(std::min<std::uint64_t>(size, piece.size() - held));
         input_.read(piece.data() + held, count);
         size -= count;
         const std::string_view text(piece.data(), held + count);
