@@ -9,6 +9,8 @@ namespace ZULMetaData {
 void reportFailedAssertion(const char* expression, const char* function, const char* file, int line) noexcept {
 #if defined(__APPLE__)
     __assert_rtn(function, file, line, expression);
+#elif defined(__EMSCRIPTEN__)
+    __assert_fail(expression, file, line, function);
 #else
     __assert_fail(expression, file, static_cast<unsigned int>(line), function);
 #endif

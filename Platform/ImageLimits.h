@@ -23,6 +23,13 @@ constexpr std::size_t rgbaSize(std::uint32_t width, std::uint32_t height) noexce
     return std::size_t{4} * width * height;
 }
 
+/// What decoding a PNG file of this size may hold at a time.
+constexpr std::uint64_t memoryToDecodePNG(std::uint32_t width, std::uint32_t height) noexcept {
+    constexpr std::uint64_t rowBuffers = 8; // a few rows of up to 16 bits a channel
+    constexpr std::uint64_t tables = std::uint64_t{128} << 10;
+    return rgbaSize(width, height) + rowBuffers * rgbaSize(width, 1) + tables;
+}
+
 inline bool isEncodable(const Image& image) noexcept {
     return isImageSizeAllowed(image.width(), image.height()) &&
            image.rgba().size() == rgbaSize(image.width(), image.height());

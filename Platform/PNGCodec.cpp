@@ -214,11 +214,7 @@ std::optional<EncodedImageInfo> readPNGInfo(std::span<const std::uint8_t> encode
     if (!reader.readHeader() || !reader.isPlausible()) {
         return std::nullopt;
     }
-    constexpr std::uint64_t rowBuffers = 8; // a few rows of up to 16 bits a channel
-    constexpr std::uint64_t tables = std::uint64_t{128} << 10;
-    const std::uint64_t pixels = rgbaSize(reader.width(), reader.height());
-    return EncodedImageInfo{reader.width(), reader.height(),
-                            pixels + rowBuffers * rgbaSize(reader.width(), 1) + tables};
+    return EncodedImageInfo{reader.width(), reader.height(), memoryToDecodePNG(reader.width(), reader.height())};
 }
 
 std::vector<std::uint8_t> encodePNG(const Image& image) {
