@@ -1,0 +1,316 @@
+#include "Bindings/JavaScript/zulmetadata_c.h"
+
+#include "Bindings/JavaScript/EntryColumns.h"
+#include "Bindings/JavaScript/SliceBuffer.h"
+#include "Tools/zulm/DumpDocument.h"
+#include "Tools/zulm/EntryFormat.h"
+#include "Tools/zulm/InfoReport.h"
+#include "Tools/zulm/Recording.h"
+#include "Tools/zulm/Report.h"
+#include "Tools/zulm/Text.h"
+#include "Tools/zulm/VerifyReport.h"
+#include "ZULMetaData/ContainerRecognition.h"
+
+#include <fmt/core.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <exception>
+#include <functional>
+#include <istream>
+#include <limits>
+#include <list>
+#include <memory>
+#include <new>
+#include <optional>
+#include <sstream>
+#include <stdexcept>
+#include <string>
+#include <string_view>
+#include <system_error>
+#include <tuple>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+using namespace ZULMetaData;
+using namespace ZULMetaData::Bindings;
+
+/// In the order in which they need each other.
+struct ZulmRecording {
+    ZulmRecording(ReadSlice read, std::uint64_t size, MetaDataParser::StreamType type, const std::string& name)
+        : buffer(std::move(read), size), input(&buffer), recording(input, type, name) {}
+
+    SliceBuffer buffer;
+    std::istream input;
+    Zulm::Recording recording;
+    std::string container;
+    std::optional<double> duration;
+    std::vector<Zulm::StreamInfo> infos;
+    struct Names {
+        std::string kind; // or its identifier where it has none
+        std::string uuid;
+    };
+    std::vector<Names> names;
+    std::vector<ZulmStream> streams;
+};
+
+struct ZulmEntries {
+    std::vector<double> times;
+    std::vector<EntryColumn> columns;
+    std::vector<ZulmColumn> views;
+};
+
+struct ZulmText {
+    std::string bytes;
+};
+
+namespace {
+
+std::string& lastError() {
+    static thread_local std::string message;
+    return message;
+}
+
+/// Keeps exceptions in. Null where `work` threw.
+template <class Work>
+auto orNull(Work work) noexcept -> decltype(work()) {
+    try {
+        try {
+            return work();
+        } catch (const std::bad_alloc&) {
+            lastError() = "out of memory";
+        } catch (const std::length_error&) { // more than an address can count
+            lastError() = "out of memory";
+        } catch (const std::exception& error) {
+            lastError() = error.what();
+        }
+    } catch (...) { // no memory for the message either
+        lastError().clear();
+    }
+    return nullptr;
+}
+
+ReadSlice readingWith(ZulmReadAt readAt, void* context) {
+    return [=](std::uint64_t position, void* bytes, std::size_t size) {
+        const std::int64_t got = readAt(context, position, bytes, size);
+        if (got < 0)
+            throw std::system_error(EIO, std::generic_category(), "cannot be read");
+        return std::min(static_cast<std::size_t>(got), size);
+    };
+}
+
+MetaDataParser::StreamType typeOf(const ReadSlice& read, const std::string& name) {
+    const MetaDataParser::StreamType named = MetaDataParser::streamTypeOf(name);
+    if (named != MetaDataParser::Unknown)
+        return named;
+    std::array<char, 64> first;
+    const std::size_t size = read(0, first.data(), first.size());
+    const auto type = streamTypeOfContents({first.data(), size});
+    if (type == MetaDataParser::Unknown)
+        throw Zulm::Failure(fmt::format("{}: begins neither like a movie, nor a RIFF file, nor a stream", name));
+    return type;
+}
+
+constexpr double s_nothing = std::numeric_limits<double>::quiet_NaN();
+
+void fillIn(ZulmRecording& opened) {
+    Zulm::Recording& recording = opened.recording;
+    opened.container = recording.container();
+    opened.duration = movieDuration(recording.parser());
+    Zulm::requireRead(opened.input, recording.name());
+    opened.infos = recording.streams();
+    for (const Zulm::StreamInfo& info : opened.infos)
+        opened.names.push_back({Zulm::nameOf(info.type), Zulm::uuidText(info.type)});
+    for (std::size_t i = 0; i < opened.infos.size(); ++i) {
+        const Zulm::StreamInfo& info = opened.infos[i];
+        opened.streams.push_back({opened.names[i].kind.c_str(), opened.names[i].uuid.c_str(), info.version,
+                                  info.isDecodable ? info.entries : 0, info.range.length, info.range.offset,
+                                  info.firstTime.value_or(s_nothing), info.lastTime.value_or(s_nothing),
+                                  info.isDecodable ? 1 : 0});
+    }
+}
+
+/// The type of the column that a field of this type fills.
+template <class Value>
+constexpr ZulmColumnType columnType() {
+    if constexpr (std::same_as<Value, EntryValue>)
+        return ZulmBytes; // a cursor image
+    else if constexpr (std::same_as<Value, std::string>)
+        return ZulmTexts;
+    else if constexpr (std::same_as<Value, std::uint64_t>)
+        return ZulmInt64;
+    else
+        return std::integral<Value> ? ZulmInt32 : ZulmReal;
+}
+
+/// Collects the entries of a stream.
+template <class Kind>
+class EntryCollector final : public DataStreamObserver<typename Kind::Value> {
+public:
+    using Value = typename Kind::Value;
+
+    explicit EntryCollector(ZulmEntries& entries) : entries_(entries) {
+        const auto addColumn = [&]<class Projection>(const Field<Projection>& field) {
+            entries.columns.emplace_back(field.key, columnType<FieldValue<Field<Projection>>>());
+        };
+        std::apply([&](const auto&... field) { (addColumn(field), ...); }, Kind::fields);
+    }
+
+    bool dataRead(double time, const Value& value) override {
+        entries_.times.push_back(time);
+        if constexpr (std::same_as<Value, std::string>)
+            addFields(Zulm::validText(value));
+        else if constexpr (std::same_as<Value, std::list<std::string>>)
+            addFields(Zulm::filledUp<Kind>(value));
+        else
+            addFields(value);
+        return true;
+    }
+
+private:
+    template <class Field>
+    using FieldValue = std::remove_cvref_t<decltype(std::invoke(std::declval<Field>().valueOf, std::declval<Value>()))>;
+
+    void addFields(const Value& value) {
+        auto column = entries_.columns.begin();
+        std::apply([&](const auto&... field) { (addField(*column++, field, value), ...); }, Kind::fields);
+    }
+
+    template <class Projection>
+    static void addField(EntryColumn& column, const Field<Projection>& field, const Value& value) {
+        if constexpr (std::same_as<FieldValue<Field<Projection>>, EntryValue>)
+            column.add(value); // as it is stored
+        else
+            column.add(std::invoke(field.valueOf, value));
+    }
+
+    ZulmEntries& entries_;
+};
+
+const Zulm::StreamInfo& infoNamed(const ZulmRecording& opened, const std::string& kind) {
+    for (std::size_t i = 0; i < opened.infos.size(); ++i)
+        if (opened.names[i].kind == kind || opened.names[i].uuid == kind)
+            return opened.infos[i];
+    throw Zulm::Failure(fmt::format("{}: holds no stream {}", opened.recording.name(), kind));
+}
+
+std::vector<uuid> typesNamed(const ZulmRecording& opened, const char* kinds) {
+    std::vector<uuid> types;
+    if (!kinds) {
+        for (const Zulm::StreamInfo& info : opened.infos)
+            types.push_back(info.type);
+        return types;
+    }
+    std::istringstream list(kinds);
+    for (std::string kind; std::getline(list, kind, ',');)
+        if (const uuid type = infoNamed(opened, kind).type; std::find(types.begin(), types.end(), type) == types.end())
+            types.push_back(type);
+    return types;
+}
+
+} // namespace
+
+const char* zulm_last_error(void) {
+    return lastError().empty() ? "out of memory" : lastError().c_str();
+}
+
+ZulmRecording* zulm_open(ZulmReadAt readAt, void* context, uint64_t size, const char* name) {
+    return orNull([&] {
+        const ReadSlice read = readingWith(readAt, context);
+        auto opened = std::make_unique<ZulmRecording>(read, size, typeOf(read, name), name);
+        fillIn(*opened);
+        return opened.release();
+    });
+}
+
+void zulm_close(ZulmRecording* recording) {
+    delete recording;
+}
+
+const char* zulm_container(const ZulmRecording* recording) {
+    return recording->container.c_str();
+}
+
+double zulm_duration(const ZulmRecording* recording) {
+    return recording->duration.value_or(s_nothing);
+}
+
+size_t zulm_stream_count(const ZulmRecording* recording) {
+    return recording->streams.size();
+}
+
+const ZulmStream* zulm_stream(const ZulmRecording* recording, size_t index) {
+    return &recording->streams[index];
+}
+
+ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind) {
+    return orNull([&] {
+        const Zulm::StreamInfo& info = infoNamed(*recording, kind);
+        auto entries = std::make_unique<ZulmEntries>();
+        if (!info.isDecodable)
+            throw Zulm::Failure(fmt::format("{}: entries of {}, version {}, cannot be decoded",
+                                            recording->recording.name(), Zulm::nameOf(info.type), info.version));
+        RecordedKinds::visit(info.type, [&]<class Kind>() {
+            EntryCollector<Kind> collector(*entries);
+            recording->recording.readEntries<typename Kind::Value>(info, collector);
+        });
+        for (const EntryColumn& column : entries->columns)
+            entries->views.push_back(column.view());
+        return entries.release();
+    });
+}
+
+void zulm_free_entries(ZulmEntries* entries) {
+    delete entries;
+}
+
+size_t zulm_entry_count(const ZulmEntries* entries) {
+    return entries->times.size();
+}
+
+const double* zulm_entry_times(const ZulmEntries* entries) {
+    return entries->times.data();
+}
+
+size_t zulm_column_count(const ZulmEntries* entries) {
+    return entries->views.size();
+}
+
+const ZulmColumn* zulm_column(const ZulmEntries* entries, size_t index) {
+    return &entries->views[index];
+}
+
+ZulmText* zulm_info(ZulmRecording* recording) {
+    return orNull(
+        [&] { return new ZulmText{Zulm::reportText(Zulm::infoDocument(Zulm::inspect(recording->recording)))}; });
+}
+
+ZulmText* zulm_verify(ZulmRecording* recording) {
+    return orNull([&] {
+        Zulm::Recording& opened = recording->recording;
+        return new ZulmText{Zulm::reportText(Zulm::verifyDocument(opened.name(), opened.validation()))};
+    });
+}
+
+ZulmText* zulm_dump(ZulmRecording* recording, const char* kinds) {
+    return orNull([&] {
+        auto text = std::make_unique<ZulmText>();
+        Zulm::writeDump(recording->recording, typesNamed(*recording, kinds),
+                        [&](std::string_view piece) { text->bytes += piece; });
+        return text.release();
+    });
+}
+
+const char* zulm_text_bytes(const ZulmText* text) {
+    return text->bytes.data();
+}
+
+size_t zulm_text_size(const ZulmText* text) {
+    return text->bytes.size();
+}
+
+void zulm_free_text(ZulmText* text) {
+    delete text;
+}

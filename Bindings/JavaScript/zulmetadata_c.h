@@ -1,0 +1,108 @@
+#ifndef ZULMETADATA_C_H
+#define ZULMETADATA_C_H
+
+/*
+ * Recordings for programs that are not written in C++. The caller gives a function that reads bytes at a position, so
+ * that a recording may be a file, a slice of something larger, or anything else.
+ *
+ *     ZulmRecording* recording = zulm_open(readAt, &file, size, "Recording.mp4");
+ *     if (!recording)
+ *         return complain(zulm_last_error());
+ *     ZulmEntries* entries = zulm_read_entries(recording, "cursorLocation");
+ *     for (size_t i = 0; entries && i < zulm_entry_count(entries); ++i)
+ *         move(zulm_entry_times(entries)[i], ((const int32_t*)zulm_column(entries, 0)->values)[i]);
+ *     zulm_free_entries(entries);
+ *     zulm_close(recording);
+ *
+ * No exception leaves these functions: those that give a pointer give null where they fail, and `zulm_last_error` then
+ * says why. One thread at a time may use a recording and what was read from it.
+ */
+
+#include <stddef.h>
+#include <stdint.h>
+
+#ifdef __cplusplus
+extern "C" {
+#endif
+
+typedef struct ZulmRecording ZulmRecording;
+typedef struct ZulmEntries ZulmEntries;
+typedef struct ZulmText ZulmText;
+
+/* Reads `size` bytes from `position` on. Gives how many it read, fewer only where there are no more; -1 where reading
+   failed. */
+typedef int64_t (*ZulmReadAt)(void* context, uint64_t position, void* bytes, size_t size);
+
+/* What went wrong in the last call that failed, in words for a person. Valid until the next call that fails. */
+const char* zulm_last_error(void);
+
+/* The extension of `name` tells the container, else the first bytes do. `size` counts all bytes. */
+ZulmRecording* zulm_open(ZulmReadAt readAt, void* context, uint64_t size, const char* name);
+void zulm_close(ZulmRecording* recording);
+
+/* "movie", "RIFF" or "stream". */
+const char* zulm_container(const ZulmRecording* recording);
+
+/* Seconds; not a number where the recording does not tell. */
+double zulm_duration(const ZulmRecording* recording);
+
+typedef struct {
+    const char* kind; /* its name, or its identifier where it has none */
+    const char* uuid;
+    int32_t version;
+    uint64_t entries; /* 0 where they cannot be decoded */
+    uint64_t bytes;   /* that the file declares, header included */
+    uint64_t offset;  /* of its header in the file */
+    double first;     /* seconds, of the first and the last entry with a finite time; not a number without any */
+    double last;
+    int32_t isKnown; /* whether its entries can be decoded */
+} ZulmStream;
+
+size_t zulm_stream_count(const ZulmRecording* recording);
+const ZulmStream* zulm_stream(const ZulmRecording* recording, size_t index);
+
+typedef enum {
+    ZulmInt32 = 0, /* int32_t */
+    ZulmInt64 = 1, /* int64_t */
+    ZulmReal = 2,  /* double */
+    ZulmTexts = 3, /* uint32_t, the number of a text among the distinct ones, in UTF-8 */
+    ZulmBytes = 4  /* the same for bytes, or ZulmNothing */
+} ZulmColumnType;
+
+#define ZulmNothing UINT32_MAX
+
+typedef struct {
+    const char* name;
+    ZulmColumnType type;
+    const void* values; /* one per entry */
+
+    /* The distinct texts or bytes: number i goes from ends[i - 1], or 0, to ends[i]. */
+    const char* pool;
+    const uint64_t* ends;
+    size_t distinct;
+} ZulmColumn;
+
+/* Of the stream of this kind, or with this identifier; as far as they are whole. */
+ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind);
+void zulm_free_entries(ZulmEntries* entries);
+
+size_t zulm_entry_count(const ZulmEntries* entries);
+const double* zulm_entry_times(const ZulmEntries* entries); /* seconds */
+size_t zulm_column_count(const ZulmEntries* entries);
+const ZulmColumn* zulm_column(const ZulmEntries* entries, size_t index);
+
+/* What the tool prints as JSON: the file's object of `zulm info` and of `zulm verify`, and all that `zulm dump` prints.
+   `kinds` is a list separated by commas, or null for every stream. */
+ZulmText* zulm_info(ZulmRecording* recording);
+ZulmText* zulm_verify(ZulmRecording* recording);
+ZulmText* zulm_dump(ZulmRecording* recording, const char* kinds);
+
+const char* zulm_text_bytes(const ZulmText* text);
+size_t zulm_text_size(const ZulmText* text);
+void zulm_free_text(ZulmText* text);
+
+#ifdef __cplusplus
+}
+#endif
+
+#endif
