@@ -11,6 +11,7 @@
 #include "ZULMetaDataBridge/Source/EntryTexts.h"
 #include "ZULMetaDataBridge/Source/HumanReadableActions.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
+#include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
 #include "ZULMetaDataBridge/Source/MetaDataReaders/BaseMetaDataParser.h"
 #include "ZULMetaDataBridge/Source/MetaDataReaders/CPUUsageMetaDataParser.h"

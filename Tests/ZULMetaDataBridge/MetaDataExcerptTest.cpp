@@ -1,0 +1,89 @@
+#include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
+
+#include "Tests/Support/Bytes.h"
+#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "ZULMetaData/RecordingInfo.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <map>
+#include <sstream>
+
+namespace ZULMetaData::Test {
+namespace {
+
+std::string stream(const std::string& kind) {
+    return streamHeader(kind, 1, 16) + f64(1.5) + le32(3) + le32(4);
+}
+
+class Opened {
+public:
+    Opened(const std::string& bytes, MetaDataParser::StreamType type)
+        : input_(bytes), parser_(MetaDataParser::create(input_, type)) {}
+
+    MetaDataParser& parser() { return *parser_; }
+
+    std::map<uuid, std::string> streams() {
+        std::map<uuid, std::string> all;
+        parser_->loadAllData(all);
+        return all;
+    }
+
+private:
+    std::istringstream input_;
+    std::unique_ptr<MetaDataParser> parser_;
+};
+
+std::string excerptOf(const std::string& bytes, MetaDataParser::StreamType type) {
+    return metaDataExcerpt(Opened(bytes, type).parser());
+}
+
+const std::string s_type = atom("ftyp", "isom1234");
+const std::string s_metaData =
+    extendedAtom("ZULM", extendedAtom("DATA", stream("2b7b6af2")) + extendedAtom("DATA", stream("2b7b6a05")));
+
+TEST(MetaDataExcerpt, KeepsTheMetaDataOfAMovieByteForByte) {
+    const std::string info = atom("ZULR", std::string(64, 'i'));
+    const std::string movie = s_type + atom("mdat", std::string(5000, 'm')) + s_metaData + atom("free", "1234") + info;
+    EXPECT_EQ(excerptOf(movie, MetaDataParser::QuickTime), s_type + s_metaData + info);
+}
+
+TEST(MetaDataExcerpt, IsReadLikeItsRecording) {
+    const std::string movie = s_type + atom("mdat", "pictures") + s_metaData;
+    Opened original(movie, MetaDataParser::QuickTime);
+    Opened excerpt(metaDataExcerpt(original.parser()), MetaDataParser::QuickTime);
+    EXPECT_EQ(original.streams().size(), 2U);
+    EXPECT_EQ(excerpt.streams(), original.streams());
+}
+
+TEST(MetaDataExcerpt, KeepsWhatTheFileHoldsOfAnAtomThatIsCutShort) {
+    const std::string movie = s_type + s_metaData;
+    const std::string cut = movie.substr(0, movie.size() - 5);
+    EXPECT_EQ(excerptOf(cut, MetaDataParser::QuickTime), cut);
+}
+
+TEST(MetaDataExcerpt, LeavesOutAnAtomWithoutAnEnd) {
+    const std::string open = be32(0) + "ZULM" + be64(0) + "rest";
+    EXPECT_EQ(excerptOf(s_type + open, MetaDataParser::QuickTime), s_type);
+}
+
+TEST(MetaDataExcerpt, OfARIFFFileIsOne) {
+    const std::string metaData = chunk("ZULM", chunk("DATA", stream("2b7b6af2")));
+    const std::string file = chunk("RIFF", "WAVE" + chunk("data", "sound")) + metaData;
+    EXPECT_EQ(excerptOf(file, MetaDataParser::Riff), chunk("RIFF", "WAVE") + metaData);
+    Opened excerpt(excerptOf(file, MetaDataParser::Riff), MetaDataParser::Riff);
+    EXPECT_THAT(excerpt.streams(), testing::ElementsAre(testing::Pair(testing::_, stream("2b7b6af2"))));
+}
+
+TEST(MetaDataExcerpt, OfABareStreamIsAllOfIt) {
+    EXPECT_EQ(excerptOf(stream("2b7b6af2"), MetaDataParser::RawStream), stream("2b7b6af2"));
+}
+
+TEST(MetaDataExcerpt, OfAMovieWithoutMetaDataIsItsTypeAlone) {
+    EXPECT_EQ(excerptOf(s_type + atom("mdat", "pictures"), MetaDataParser::QuickTime), s_type);
+    EXPECT_EQ(excerptOf("", MetaDataParser::QuickTime), "");
+}
+
+} // namespace
+} // namespace ZULMetaData::Test

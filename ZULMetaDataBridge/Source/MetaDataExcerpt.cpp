@@ -1,0 +1,53 @@
+#include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
+
+#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/StreamExtent.h"
+
+#include <algorithm>
+#include <cstdint>
+#include <cstring>
+#include <span>
+
+namespace ZULMetaData {
+
+namespace {
+
+/// As far as the file holds them.
+std::string bytesOf(const ReadBytes& read, std::uint64_t total, std::uint64_t begin, std::uint64_t end) {
+    std::string bytes;
+    bytes.resize(static_cast<std::size_t>(std::min(end, total) - std::min(begin, total)));
+    bytes.resize(read(begin, bytes));
+    return bytes;
+}
+
+/// What a RIFF file begins with, without any chunk in it.
+std::string emptyRIFF(std::string start) {
+    constexpr std::size_t sizeOffset = 4;
+    constexpr std::uint32_t formSize = 4;
+    if (start.size() == sizeOffset + sizeof formSize + formSize)
+        std::memcpy(start.data() + sizeOffset, &formSize, sizeof formSize);
+    return start;
+}
+
+} // namespace
+
+std::string metaDataExcerpt(MetaDataParser& recording) {
+    std::istream& stream = recording.getStream();
+    stream.clear();
+    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+    const ReadBytes read = readingFrom(stream);
+    if (recording.getStreamType() == MetaDataParser::RawStream)
+        return bytesOf(read, total, 0, total);
+    std::string excerpt;
+    for (const ContainerItem& item : listTopLevel(stream, recording.getStreamType())) {
+        if (item.type == "RIFF" && item.offset == 0)
+            excerpt += emptyRIFF(bytesOf(read, total, 0, item.headerSize + 4));
+        if (item.type == "ftyp" || item.type == "ZULR" || item.holdsMetaData())
+            excerpt += bytesOf(read, total, item.offset, std::max(item.end(), item.offset));
+        if (recording.getStreamType() == MetaDataParser::Riff)
+            excerpt.resize(excerpt.size() + excerpt.size() % 2);
+    }
+    return excerpt;
+}
+
+} // namespace ZULMetaData
