@@ -57,7 +57,7 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         commands.push_back(name.substr(5));
     }
     EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "diff", "dump", "extract", "grep", "info",
-                                                        "redact", "repair", "salvage", "stamp", "verify"));
+                                                        "redact", "repair", "salvage", "stamp", "verify", "view"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
@@ -144,6 +144,18 @@ TEST_F(Schema, HoldsForRedact) {
     expectValid({outputOf({"redact", movie(), "-o", folder / "public.mp4", "--keys", "--titles", "README", "--range",
                            "1:2", "--streams", "systemData"}),
                  outputOf({"redact", torn(), "-o", folder / "public.dat", "--range", "1:"})});
+}
+
+TEST_F(Schema, HoldsForWhatPagesHold) {
+    const std::string page = written("page.html", "<head></head>");
+    std::vector<std::string> documents;
+    for (const std::string& file : {movie(), odd(), torn()}) {
+        runTool({"view", file, "-o", folder / "out.html", "--page", page, "--force"});
+        const std::string text = contentsOf(folder / "out.html");
+        const std::size_t start = text.find('{');
+        documents.push_back(text.substr(start, text.rfind('}') + 1 - start));
+    }
+    expectValid(documents);
 }
 
 TEST_F(Schema, HoldsForEveryGoldenOutput) {

@@ -36,4 +36,5 @@ zulm_add_tool_test(Tools/SchemaTest)
 target_compile_definitions(Tools.SchemaTest PRIVATE
   ZULM_DOCS="${PROJECT_SOURCE_DIR}/Docs" ZULM_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/Data")
 zulm_add_tool_test(Tools/ToolRunTest)
+zulm_add_tool_test(Tools/ViewCommandTest)
 include(Tools/VerifyTests.cmake)

@@ -3,7 +3,7 @@
 namespace Zulm {
 
 std::vector<CommandGroup> commandGroups() {
-    return {{"Look", {addInfoCommand, addAtomsCommand, addDumpCommand, addDiffCommand, addGrepCommand}},
+    return {{"Look", {addInfoCommand, addAtomsCommand, addDumpCommand, addDiffCommand, addGrepCommand, addViewCommand}},
             {"Check and rescue", {addVerifyCommand, addRepairCommand, addSalvageCommand}},
             {"Change", {addAttachCommand, addStampCommand, addRedactCommand}},
             {"Convert", {addExtractCommand, addConvertCommand}},

@@ -1,0 +1,62 @@
+#include "Tools/zulm/ViewerPage.h"
+
+#include "Tools/zulm/EntryFormat.h"
+#include "Tools/zulm/InfoReport.h"
+#include "Tools/zulm/Text.h"
+#include "Tools/zulm/VerifyReport.h"
+
+#include <fmt/core.h>
+
+#include <filesystem>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+using Json = nlohmann::ordered_json;
+
+namespace {
+
+bool isPlainInAddress(char c) {
+    const auto isBetween = [c](char first, char last) { return c >= first && c <= last; };
+    return isBetween('a', 'z') || isBetween('A', 'Z') || isBetween('0', '9') ||
+           std::string_view("-._~/").find(c) != std::string_view::npos;
+}
+
+} // namespace
+
+Json viewDocument(Recording& recording, const Json& movie) {
+    const std::string excerpt = orUnreadable(recording.name(), [&] { return metaDataExcerpt(recording.parser()); });
+    const std::string name = std::filesystem::path(recording.name()).filename().string();
+    return {{"schema", "zulm.view"},
+            {"schema_version", 1},
+            {"tool_version", ZULM_VERSION},
+            {"name", validText(name)},
+            {"moviePoster", nullptr},
+            {"info", infoDocument(inspect(recording))},
+            {"verify", verifyDocument(recording.name(), recording.validation())},
+            {"metadata", base64(excerpt)},
+            {"movie", movie}};
+}
+
+std::string relativeAddress(const std::string& file, const std::string& folder) {
+    namespace fs = std::filesystem;
+    const fs::path base = fs::canonical(folder.empty() ? "." : folder);
+    std::string address;
+    for (const char c : fs::canonical(file).lexically_relative(base).generic_string())
+        address += isPlainInAddress(c) ? std::string(1, c) : fmt::format("%{:02X}", static_cast<unsigned char>(c));
+    return address;
+}
+
+std::string embeddedAddress(const Recording& recording) {
+    const bool isWave = recording.container() == containerName(MetaDataParser::Riff);
+    return fmt::format("data:{};base64,", isWave ? "audio/wav" : "video/mp4");
+}
+
+std::string scriptText(const Json& document) {
+    std::string text;
+    for (const char c : jsonLine(document))
+        text += c == '<' ? std::string("\\u003c") : std::string(1, c);
+    return text;
+}
+
+} // namespace Zulm
