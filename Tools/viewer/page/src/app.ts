@@ -1,0 +1,296 @@
+// The page: a recording, a player, and everything that shows where they are.
+
+import { Decoder } from './decoder/client';
+import { embeddedRecording, type EmbeddedRecording } from './decoder/embedded';
+import { EntriesPane } from './entries/pane';
+import { showCheck, showFacts } from './facts/pane';
+import { Timeline } from './lanes/timeline';
+import { clock } from './model/format';
+import { markerAfter, markerBefore } from './model/markers';
+import { Session, type Decoded } from './model/session';
+import { timeInLink, linkTo } from './model/link';
+import { layers } from './stage/layers';
+import { Player } from './stage/player';
+import { Stage } from './stage/stage';
+import { setUpAutomation } from './ui/automation';
+import { setUpControls, type Controls } from './ui/controls';
+import { ask, setUpDialogs, showHelp } from './ui/dialogs';
+import { announce, byId, setText } from './ui/dom';
+import { setUpDrop } from './ui/drop';
+import { placeIcons } from './ui/icons';
+import { setUpKeys } from './ui/keys';
+import { mark, measured } from './ui/marks';
+import { setUpSplitters } from './ui/splitter';
+import { setUpTabs, showTab } from './ui/tabs';
+import { setUpTheme } from './ui/theme';
+
+const frameLength = 1 / 30; // seconds, where the movie does not tell
+
+export class App {
+  readonly player = new Player(byId<HTMLVideoElement>('movie'));
+  readonly stage = new Stage(this.player);
+  readonly decoder = new Decoder();
+  session: Session | undefined;
+  private movieUrl = '';
+  private movieName = '';
+  private isFramePending = false;
+  private opened = 0;
+  private controls!: Controls;
+  private readonly timeline: Timeline;
+  private readonly entries: EntriesPane;
+
+  constructor() {
+    const showsKeys = () => this.stage.showsKeys;
+    this.timeline = new Timeline({
+      showsKeys,
+      onSeek: (time) => this.seek(time),
+      onRange: ({ from, to }) => {
+        this.stage.setHeatRange(from, to);
+        this.requestFrame();
+      },
+    });
+    this.entries = new EntriesPane({
+      showsKeys,
+      onSeek: (time) => this.seek(time),
+      onSave: () => void this.save(),
+      onProblem: (text) => this.complain(text),
+    });
+  }
+
+  start(): void {
+    placeIcons();
+    setUpTabs(() => this.requestFrame());
+    setUpSplitters();
+    setUpDialogs();
+    setUpDrop((file) => void this.openFile(file));
+    this.controls = setUpControls(this);
+    setUpKeys(this);
+    setUpAutomation(this);
+    setUpTheme(() => {
+      this.timeline.invalidate();
+      this.requestFrame();
+    });
+    byId('notice-close').addEventListener('click', () => void (byId('notice').hidden = true));
+    window.addEventListener('hashchange', () => this.followLink());
+    this.player.onChange = () => this.playerChanged();
+    this.stage.images.onDecoded = () => this.requestFrame();
+    this.openEmbedded();
+  }
+
+  // Opening
+
+  private openEmbedded(): void {
+    let embedded: EmbeddedRecording | undefined;
+    try {
+      embedded = embeddedRecording();
+    } catch (error) {
+      return this.complain(`This page's recording cannot be read: ${wordsOf(error)}.`);
+    }
+    if (!embedded) return;
+    const { metadata, name, movie, info, verify } = embedded;
+    this.setMovie(movie, movie ?? '');
+    void this.open(metadata, name, (decoded) => ({ ...decoded, info, verify, duration: info.duration ?? decoded.duration }));
+  }
+
+  async openFile(file: File): Promise<void> {
+    const url = URL.createObjectURL(file);
+    await this.open(file, file.name, (decoded) => {
+      this.setMovie(url, file.name);
+      return decoded;
+    });
+    if (this.movieUrl !== url) URL.revokeObjectURL(url);
+  }
+
+  /// What is open stays where the new one cannot be read.
+  private async open(source: Blob | string, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
+    const opening = ++this.opened;
+    document.body.classList.add('is-busy');
+    try {
+      const { decoded, problems } = await this.decoder.open(source, name);
+      if (opening !== this.opened) return;
+      byId('notice').hidden = true;
+      this.show(new Session(complete(decoded)));
+      if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
+    } catch (error) {
+      if (opening === this.opened) this.complain(`${name} cannot be shown: ${wordsOf(error)}.`);
+    } finally {
+      if (opening === this.opened) document.body.classList.remove('is-busy');
+    }
+  }
+
+  private setMovie(url: string | null, name: string): void {
+    if (this.movieUrl.startsWith('blob:')) URL.revokeObjectURL(this.movieUrl);
+    this.movieUrl = url ?? '';
+    this.movieName = name.startsWith('data:') ? '' : name;
+  }
+
+  private show(session: Session): void {
+    this.session = session;
+    document.body.classList.remove('is-empty');
+    document.title = `${session.name} – ZULMetaData`;
+    setText(byId('recording-name'), session.name);
+    const canHavePictures = session.container !== 'stream';
+    this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration);
+    this.stage.show(session);
+    this.timeline.show(session, this.player.duration);
+    showFacts(session, this.player.duration);
+    showCheck(session);
+    this.entries.show(session);
+    this.followLink();
+    this.frame();
+    mark('zulm:first-picture');
+    void this.stage.images.prepare(session.appearances);
+    announce(`${session.name} is open`);
+  }
+
+  // Time
+
+  seek(time: number): void {
+    this.player.seek(time);
+    this.timeline.reveal(this.player.time);
+  }
+
+  step(seconds: number): void {
+    this.seek(this.player.time + seconds);
+  }
+
+  stepFrame(direction: 1 | -1): void {
+    this.player.pause();
+    this.step(direction * frameLength);
+  }
+
+  stepMarker(direction: 1 | -1): void {
+    const markers = this.session?.markers ?? new Float64Array();
+    const { time } = this.player;
+    const marker = direction > 0 ? markerAfter(markers, time) : markerBefore(markers, time);
+    if (marker === undefined) return announce(direction > 0 ? 'No further marker' : 'No marker before');
+    this.seek(marker);
+    announce(`Marker at ${clock(marker)}`);
+  }
+
+  stepMatch(direction: 1 | -1): void {
+    showTab('tab-entries');
+    this.entries.step(direction);
+  }
+
+  zoom(factor: number): void {
+    if (factor === 0) this.timeline.showAll();
+    else this.timeline.zoom(factor);
+  }
+
+  private followLink(): void {
+    const time = timeInLink(location.hash);
+    if (time !== undefined && this.session && Math.abs(time - this.player.time) > 0.0005) this.seek(time);
+  }
+
+  /// The address tells the time, but not sixty times a second: browsers allow few changes.
+  private writeLink = debounced(() => {
+    if (!this.session || this.player.playing) return;
+    const link = linkTo(this.player.time);
+    if (link !== location.hash) history.replaceState(null, '', link);
+  }, 300);
+
+  // What is shown
+
+  switchLayer(id: string): void {
+    const layer = layers.find((layer) => layer.id === id);
+    if (!layer) return;
+    layer.isOn = !layer.isOn;
+    this.controls.showState();
+    announce(`${layer.name} ${layer.isOn ? 'shown' : 'hidden'}`);
+    this.requestFrame();
+  }
+
+  switchKeys(): void {
+    this.stage.showsKeys = !this.stage.showsKeys;
+    this.controls.showState();
+    this.entries.refresh();
+    this.timeline.invalidate();
+    announce(this.stage.showsKeys ? 'Keys are shown' : 'Keys are masked');
+    this.requestFrame();
+  }
+
+  findEntries(): void {
+    showTab('tab-entries');
+    this.entries.focusFilter();
+  }
+
+  help(): void {
+    showHelp();
+  }
+
+  private playerChanged(): void {
+    if (this.session) this.timeline.setDuration(this.player.duration);
+    this.stage.lay();
+    this.controls.showState();
+    this.tellOfMovie();
+    this.writeLink();
+    this.requestFrame();
+  }
+
+  private tellOfMovie(): void {
+    const note = byId('stage-note');
+    const { movie } = this.player;
+    note.hidden = !this.session || movie === 'ready' || movie === 'loading';
+    const reason = movie === 'failed' ? `${this.movieName || 'The movie'} is not beside this page, or has no pictures that this browser can show.` : 'There is no movie with this recording.';
+    setText(note, `${reason} The recorded region stands for it.`);
+  }
+
+  complain(text: string): void {
+    setText(byId('notice-text'), text);
+    byId('notice').hidden = false;
+  }
+
+  requestFrame(): void {
+    if (this.isFramePending) return;
+    this.isFramePending = true;
+    requestAnimationFrame((now) => {
+      this.isFramePending = false;
+      this.player.tick(now);
+      this.frame();
+      if (this.player.playing) this.requestFrame();
+    });
+  }
+
+  private frame(): void {
+    if (!this.session) return;
+    measured('zulm:frame', () => {
+      const { time, playing } = this.player;
+      if (playing) this.timeline.reveal(time);
+      this.stage.draw(time);
+      this.timeline.draw(time);
+      this.controls.showTime(time, this.player.duration);
+      this.entries.setTime(time);
+    });
+  }
+
+  // Saving
+
+  private async save(): Promise<void> {
+    const hasKeys = (this.session?.track('keyboardAction')?.count ?? 0) > 0;
+    if (hasKeys && !this.stage.showsKeys) {
+      const agrees = await ask('Save with everything that was typed?', 'The file will hold every key in clear, though this page masks them.', 'Save');
+      if (!agrees) return;
+    }
+    try {
+      const url = URL.createObjectURL(new Blob([await this.decoder.dump()], { type: 'application/json' }));
+      const link = Object.assign(document.createElement('a'), { href: url, download: `${this.session?.name ?? 'recording'}.json` });
+      link.click();
+      setTimeout(() => URL.revokeObjectURL(url), 10_000);
+    } catch (error) {
+      this.complain(`The entries could not be saved: ${wordsOf(error)}.`);
+    }
+  }
+}
+
+function wordsOf(error: unknown): string {
+  return (error instanceof Error ? error.message : String(error)).replace(/\.$/, '');
+}
+
+function debounced(action: () => void, delay: number): () => void {
+  let timer: ReturnType<typeof setTimeout> | undefined;
+  return () => {
+    clearTimeout(timer);
+    timer = setTimeout(action, delay);
+  };
+}

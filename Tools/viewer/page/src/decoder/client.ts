@@ -1,0 +1,60 @@
+// The page's side of the decoder.
+
+import type { Decoded } from '../model/session';
+import type { Reply, Request } from './protocol';
+import DecoderWorker from './worker?worker&inline';
+
+type Wish = Request extends infer One ? (One extends Request ? Omit<One, 'id'> : never) : never;
+
+export class DecoderError extends Error {}
+
+export class Decoder {
+  private worker: Worker | undefined;
+  private lastId = 0;
+  private readonly waiting = new Map<number, { done: (reply: Reply) => void; failed: (error: Error) => void }>();
+
+  /// A file is read in slices, as far as needed; a text is the file itself in base64.
+  async open(source: Blob | string, name: string): Promise<{ decoded: Decoded; problems: string[] }> {
+    const reply = await this.ask({ type: 'open', source, name });
+    if (reply.type !== 'opened') throw new DecoderError('the decoder answered something else');
+    return reply;
+  }
+
+  /// All entries as the tool prints them.
+  async dump(): Promise<string> {
+    const reply = await this.ask({ type: 'dump' });
+    if (reply.type !== 'dumped') throw new DecoderError('the decoder answered something else');
+    return reply.text;
+  }
+
+  private ask(wish: Wish): Promise<Reply> {
+    const id = ++this.lastId;
+    return new Promise((done, failed) => {
+      this.waiting.set(id, { done, failed });
+      this.running().postMessage({ ...wish, id });
+    });
+  }
+
+  private running(): Worker {
+    if (this.worker) return this.worker;
+    const worker = new DecoderWorker();
+    worker.onmessage = ({ data }: MessageEvent<Reply>) => this.receive(data);
+    worker.onerror = (event) => this.giveUp(event.message || 'it could not be started');
+    return (this.worker = worker);
+  }
+
+  private receive(reply: Reply): void {
+    const asked = this.waiting.get(reply.id);
+    this.waiting.delete(reply.id);
+    if (reply.type === 'failed') asked?.failed(new DecoderError(reply.message));
+    else asked?.done(reply);
+  }
+
+  /// The next question starts another one.
+  private giveUp(reason: string): void {
+    this.worker?.terminate();
+    this.worker = undefined;
+    for (const { failed } of this.waiting.values()) failed(new DecoderError(`the decoder stopped (${reason})`));
+    this.waiting.clear();
+  }
+}

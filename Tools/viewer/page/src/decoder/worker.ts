@@ -1,0 +1,79 @@
+// Decodes a recording away from the page, so that the page goes on whatever the file holds.
+
+import { Recording, ZulmError, type Entries } from '#decoder';
+import type { Decoded } from '../model/session';
+import type { Reply, Request } from './protocol';
+
+let recording: Recording | undefined;
+
+/// In words for a person.
+function wordsOf(error: unknown): string {
+  if (error instanceof ZulmError) return error.message;
+  return `the decoder stopped (${error instanceof Error ? error.message : String(error)})`;
+}
+
+function bytesOf(base64: string): Uint8Array {
+  const text = atob(base64);
+  const bytes = new Uint8Array(text.length);
+  for (let i = 0; i < text.length; ++i) bytes[i] = text.charCodeAt(i);
+  return bytes;
+}
+
+function decode(opened: Recording, name: string): { decoded: Decoded; problems: string[] } {
+  const problems: string[] = [];
+  const attempt = <Result>(what: string, action: () => Result): Result | undefined => {
+    try {
+      return action();
+    } catch (error) {
+      problems.push(`${what}: ${wordsOf(error)}`);
+      return undefined;
+    }
+  };
+  const entries: Entries[] = [];
+  for (const { kind, known } of opened.streams) {
+    const read = known ? attempt(kind, () => opened.entries(kind)) : undefined;
+    if (read) entries.push(read);
+  }
+  const decoded = {
+    name,
+    container: opened.container,
+    duration: opened.duration,
+    streams: opened.streams.map((stream) => ({ ...stream })),
+    entries,
+    info: attempt('facts', () => opened.info()) ?? {},
+    verify: attempt('check', () => opened.verify()) ?? {},
+  };
+  return { decoded, problems };
+}
+
+/// What can be handed over instead of copied.
+function transferable({ entries }: Decoded): ArrayBuffer[] {
+  const buffers = new Set<ArrayBuffer>();
+  for (const { time, columns } of entries)
+    for (const column of [time, ...Object.values(columns)])
+      if (ArrayBuffer.isView(column) && column.buffer instanceof ArrayBuffer) buffers.add(column.buffer);
+  return [...buffers];
+}
+
+async function answer(request: Request): Promise<[Reply, ArrayBuffer[]]> {
+  const { id } = request;
+  if (request.type === 'dump') {
+    if (!recording) throw new ZulmError('nothing is open');
+    return [{ id, type: 'dumped', text: recording.dump(request.kinds) }, []];
+  }
+  const { source, name } = request;
+  recording?.close();
+  recording = undefined;
+  recording = await Recording.open(typeof source === 'string' ? bytesOf(source) : source, name);
+  const { decoded, problems } = decode(recording, name);
+  return [{ id, type: 'opened', decoded, problems }, transferable(decoded)];
+}
+
+self.onmessage = async ({ data }: MessageEvent<Request>) => {
+  try {
+    const [reply, buffers] = await answer(data);
+    self.postMessage(reply, { transfer: buffers });
+  } catch (error) {
+    self.postMessage({ id: data.id, type: 'failed', message: wordsOf(error) } satisfies Reply);
+  }
+};

@@ -1,0 +1,38 @@
+// Rows as texts for other programs.
+
+import type { CellValue, Rows } from './rows';
+
+export function asJSON(rows: Rows, chosen: Iterable<number>): string {
+  const lines: string[] = [];
+  for (const row of chosen) lines.push(JSON.stringify(rows.fields(row)));
+  return `[${lines.join(',\n ')}]\n`;
+}
+
+function field(value: CellValue | undefined): string {
+  if (value === null || value === undefined) return '';
+  const text = String(value);
+  return /[",\r\n]/.test(text) ? `"${text.replaceAll('"', '""')}"` : text;
+}
+
+export function asCSV(rows: Rows, chosen: Iterable<number>): string {
+  const all = [...chosen].map((row) => rows.fields(row));
+  const names = [...new Set(all.flatMap((fields) => Object.keys(fields)))];
+  return [names, ...all.map((fields) => names.map((name) => fields[name]))]
+    .map((values) => values.map((value) => field(value)).join(',') + '\n')
+    .join('');
+}
+
+/// Pages from a disk may have no clipboard of their own.
+export async function copyText(text: string): Promise<void> {
+  try {
+    await navigator.clipboard.writeText(text);
+  } catch {
+    const area = document.createElement('textarea');
+    area.value = text;
+    document.body.append(area);
+    area.select();
+    const isCopied = document.execCommand('copy');
+    area.remove();
+    if (!isCopied) throw new Error('the browser does not let this page copy');
+  }
+}

@@ -1,0 +1,164 @@
+// The entries of every stream: look, filter, go there, copy.
+
+import { count, plural, titleOf } from '../model/format';
+import { partition } from '../model/search';
+import type { Session } from '../model/session';
+import { announce, byId, make, setText } from '../ui/dom';
+import { setIcon } from '../ui/icons';
+import { asCSV, asJSON, copyText } from './copy';
+import { filterRows, testOf } from './filter';
+import { AllRows, StreamRows, type Rows } from './rows';
+import { Table } from './table';
+
+export interface EntriesEvents {
+  showsKeys: () => boolean;
+  onSeek: (time: number) => void;
+  onSave: () => void;
+  onProblem: (text: string) => void;
+}
+
+const mostCopied = 500_000;
+
+export class EntriesPane {
+  private session: Session | undefined;
+  private rows: Rows | undefined;
+  private matches: Uint32Array | null = null;
+  private search = 0;
+  private time = -1;
+  private readonly table = new Table();
+  private readonly stream = make('select', { 'aria-label': 'Stream', class: 'select' });
+  private readonly query = make('input', {
+    type: 'search',
+    class: 'field',
+    placeholder: 'Filter: words, x>800, action=left',
+    'aria-label': 'Filter entries',
+    spellcheck: 'false',
+    autocomplete: 'off',
+  });
+  private readonly status = make('output', { class: 'entries-status', 'aria-live': 'polite' });
+  private readonly note = make('p', { class: 'entries-note', hidden: true });
+
+  constructor(private readonly events: EntriesEvents) {
+    const find = make('div', { class: 'find' }, this.query,
+      this.tool('up', 'Previous match', () => this.step(-1)),
+      this.tool('down', 'Next match', () => this.step(1)));
+    const tools = make('div', { class: 'entries-tools' }, this.status,
+      this.tool('copy', 'Copy as JSON', () => void this.copy('JSON', asJSON), 'JSON'),
+      this.tool('copy', 'Copy as CSV', () => void this.copy('CSV', asCSV), 'CSV'),
+      this.tool('save', 'Save all entries as a JSON file', () => this.events.onSave()));
+    byId('pane-entries').append(make('div', { class: 'entries-head' }, this.stream, find, tools, this.note), this.table.element);
+    this.stream.addEventListener('change', () => this.choose(this.stream.value));
+    this.query.addEventListener('input', () => this.filter());
+    this.query.addEventListener('keydown', (event) => {
+      if (event.key !== 'Enter') return;
+      event.preventDefault();
+      this.step(event.shiftKey ? -1 : 1);
+    });
+    this.table.onActivate = (row) => this.go(row);
+  }
+
+  private tool(icon: string, name: string, action: () => void, text = ''): HTMLButtonElement {
+    const button = make('button', { type: 'button', class: text ? 'button is-small' : 'button is-icon is-small', 'aria-label': name, title: name }, text);
+    setIcon(button, icon);
+    button.addEventListener('click', action);
+    return button;
+  }
+
+  show(session: Session): void {
+    this.session = session;
+    const option = (value: string, text: string) => make('option', { value }, text);
+    const streams = session.allTracks().map(({ kind, entries }) => option(kind, `${titleOf(kind)} (${count(entries.time.length)})`));
+    const all = session.allTracks().reduce((sum, { count }) => sum + count, 0);
+    this.stream.replaceChildren(option('', `All streams (${count(all)})`), ...streams);
+    this.query.value = '';
+    this.choose('');
+  }
+
+  focusFilter(): void {
+    this.query.focus();
+    this.query.select();
+  }
+
+  /// After the reader has asked for what was typed, or no longer.
+  refresh(): void {
+    this.noteMask();
+    this.table.refresh();
+    if (this.query.value) this.filter();
+  }
+
+  setTime(time: number): void {
+    if (time === this.time || !this.rows) return;
+    this.time = time;
+    this.table.setCurrent(this.rows.rowAt(time), true);
+  }
+
+  private choose(kind: string): void {
+    const { session, events } = this;
+    if (!session) return;
+    const track = session.track(kind);
+    this.rows = track ? new StreamRows(track, events.showsKeys) : new AllRows(session.allTracks(), events.showsKeys);
+    this.table.show(this.rows);
+    this.noteMask();
+    this.filter();
+    const { time } = this;
+    this.time = -1;
+    this.setTime(Math.max(0, time));
+  }
+
+  private noteMask(): void {
+    const kind = this.stream.value;
+    this.note.hidden = this.events.showsKeys() || kind !== 'keyboardAction';
+    setText(this.note, 'What was typed is masked, here and in copies. Press k to see it.');
+  }
+
+  private filter(): void {
+    const { rows } = this;
+    if (!rows) return;
+    const search = ++this.search;
+    const test = testOf(this.query.value);
+    if (!test) return this.showMatches(rows, null, true);
+    void filterRows(rows, test, () => search !== this.search, (matches, isDone) => this.showMatches(rows, matches, isDone));
+  }
+
+  private showMatches(rows: Rows, matches: Uint32Array | null, isDone: boolean): void {
+    this.matches = matches;
+    this.table.choose(matches);
+    const found = matches ? `${count(matches.length)} of ${count(rows.count)}` : plural(rows.count, 'entry', 'entries');
+    setText(this.status, isDone ? found : `${found} …`);
+  }
+
+  /// To the next match, or entry, behind or before the playhead.
+  step(direction: 1 | -1): void {
+    const { rows, matches, session } = this;
+    if (!rows || !session) return;
+    const length = matches?.length ?? rows.count;
+    const timeOf = (place: number) => rows.time(matches ? matches[place]! : place);
+    const near = 0.0005;
+    const place =
+      direction > 0
+        ? partition(length, (i) => timeOf(i) <= this.time + near)
+        : partition(length, (i) => timeOf(i) < this.time - near) - 1;
+    if (place < 0 || place >= length) return announce(direction > 0 ? 'No further match' : 'No match before');
+    this.go(matches ? matches[place]! : place);
+  }
+
+  private go(row: number): void {
+    const time = this.rows?.time(row) ?? NaN;
+    if (!Number.isFinite(time)) return;
+    this.events.onSeek(time);
+    this.table.select(row);
+  }
+
+  private async copy(name: string, write: (rows: Rows, chosen: Iterable<number>) => string): Promise<void> {
+    if (!this.rows) return;
+    const wanted = [...this.table.wanted()];
+    if (wanted.length > mostCopied)
+      return this.events.onProblem(`${plural(wanted.length, 'entry', 'entries')} are too many to copy: filter them first, or save them as a file.`);
+    try {
+      await copyText(write(this.rows, wanted));
+      setText(this.status, `${plural(wanted.length, 'entry', 'entries')} copied as ${name}`);
+    } catch (error) {
+      this.events.onProblem(`The entries could not be copied: ${error instanceof Error ? error.message : error}.`);
+    }
+  }
+}

@@ -1,0 +1,202 @@
+// A table that stays smooth however long it is: only the rows in sight are elements.
+
+import { countUntil } from '../model/search';
+import { make, setText } from '../ui/dom';
+import { uiScale } from '../ui/scale';
+import type { Rows } from './rows';
+
+const rowLines = 24; // pixels of a row where text has its usual size
+const tallest = 16_000_000; // pixels: browsers do not lay out much more
+
+export class Table {
+  readonly element = make('div', { class: 'table' });
+  onActivate: (row: number) => void = () => {};
+  private rows: Rows | undefined;
+  /// The rows to show; null is all of them.
+  private chosen: Uint32Array | null = null;
+  private readonly head = make('div', { class: 'table-head', role: 'row', 'aria-rowindex': 1 });
+  private readonly scroller = make('div', { class: 'table-body', role: 'rowgroup' });
+  private readonly space = make('div', { class: 'table-space', role: 'presentation' });
+  private readonly grid = make('div', { class: 'table-grid', role: 'grid', tabindex: 0, 'aria-label': 'Entries' });
+  private pool: HTMLElement[] = [];
+  private rowHeight = rowLines;
+  private current = -1;
+  /// Places of the chosen rows, the second one where the selection was begun.
+  private selected = -1;
+  private anchor = -1;
+
+  constructor() {
+    this.scroller.append(this.space);
+    this.grid.append(this.head, this.scroller);
+    this.element.append(this.grid);
+    this.scroller.addEventListener('scroll', () => this.draw());
+    this.grid.addEventListener('keydown', (event) => this.press(event));
+    this.space.addEventListener('click', (event) => this.click(event));
+    new ResizeObserver(() => this.resize()).observe(this.scroller);
+  }
+
+  show(rows: Rows): void {
+    [this.rows, this.chosen, this.current, this.selected, this.anchor] = [rows, null, -1, -1, -1];
+    const widths = rows.columns.map(({ name, isNumber }, i) =>
+      i === 0 ? '4.75rem' : name === 'kind' ? '8rem' : isNumber ? 'minmax(3.5rem, 1fr)' : 'minmax(7rem, 2fr)',
+    );
+    this.element.style.setProperty('--columns', widths.join(' '));
+    this.element.style.setProperty('--least', `${rows.columns.reduce((sum, { isNumber }, i) => sum + (i === 0 ? 5.5 : isNumber ? 4.25 : 7.75), 1.5)}rem`);
+    this.head.replaceChildren(
+      ...rows.columns.map(({ title, isNumber }) =>
+        make('div', { role: 'columnheader', class: isNumber ? 'is-number' : undefined, title }, title),
+      ),
+    );
+    for (const element of this.pool) element.remove();
+    this.pool = [];
+    this.grid.setAttribute('aria-colcount', String(rows.columns.length));
+    this.scroller.scrollTop = 0;
+    this.resize();
+  }
+
+  choose(chosen: Uint32Array | null): void {
+    this.chosen = chosen;
+    [this.selected, this.anchor] = [-1, -1];
+    this.resize();
+  }
+
+  get shownCount(): number {
+    return this.chosen?.length ?? this.rows?.count ?? 0;
+  }
+
+  /// The rows that are selected, or all that are shown.
+  *wanted(): Generator<number> {
+    const hasSelection = this.selected >= 0 && this.selected !== this.anchor;
+    const first = hasSelection ? Math.min(this.selected, this.anchor) : 0;
+    const end = hasSelection ? Math.max(this.selected, this.anchor) + 1 : this.shownCount;
+    for (let place = first; place < end; ++place) yield this.rowAt(place);
+  }
+
+  /// Marks the row that holds at the playhead; keeps it in sight where `follows`.
+  setCurrent(row: number, follows: boolean): void {
+    const place = this.placeOf(row);
+    if (place === this.current) return;
+    this.current = place;
+    if (follows && place >= 0) this.reveal(place);
+    this.draw();
+  }
+
+  select(row: number): void {
+    const place = this.placeOf(row);
+    [this.selected, this.anchor] = [place, place];
+    this.reveal(place);
+    this.draw();
+  }
+
+  refresh(): void {
+    for (const element of this.pool) delete element.dataset.row;
+    this.draw();
+  }
+
+  private rowAt(place: number): number {
+    return this.chosen ? this.chosen[place]! : place;
+  }
+
+  /// Of the row itself or the last one before it that is shown.
+  private placeOf(row: number): number {
+    if (!this.chosen) return row;
+    return countUntil(this.chosen, row) - 1;
+  }
+
+  private resize(): void {
+    this.rowHeight = rowLines * uiScale();
+    this.space.style.height = `${Math.min(tallest, this.shownCount * this.rowHeight)}px`;
+    this.grid.setAttribute('aria-rowcount', String(this.shownCount + 1));
+    this.refresh();
+  }
+
+  /// Rows to a pixel of scrolling.
+  private get density(): number {
+    const room = this.scroller.clientHeight;
+    const whole = this.shownCount * this.rowHeight;
+    return whole <= tallest ? 1 : (whole - room) / (tallest - room);
+  }
+
+  private reveal(place: number): void {
+    const { scroller, density } = this;
+    const top = scroller.scrollTop * density;
+    const room = scroller.clientHeight;
+    const y = place * this.rowHeight;
+    if (room <= 0 || (y >= top && y + this.rowHeight <= top + room)) return;
+    const isNear = y > top - room && y < top + 2 * room;
+    const target = isNear ? (y < top ? y : y + this.rowHeight - room) : y - room / 2;
+    scroller.scrollTop = Math.max(0, target) / density;
+  }
+
+  private draw(): void {
+    const { rows, scroller } = this;
+    if (!rows || scroller.clientHeight === 0) return;
+    const top = scroller.scrollTop * this.density;
+    const first = Math.max(0, Math.floor(top / this.rowHeight) - 4);
+    const end = Math.min(this.shownCount, first + Math.ceil(scroller.clientHeight / this.rowHeight) + 9);
+    while (this.pool.length < end - first) this.pool.push(this.newRow(rows.columns));
+    this.pool.forEach((element, i) => {
+      const place = first + i;
+      element.hidden = place >= end;
+      if (place >= end) return;
+      element.style.transform = `translateY(${scroller.scrollTop + place * this.rowHeight - top}px)`;
+      this.fill(element, rows, place);
+    });
+  }
+
+  private newRow(columns: Rows['columns']): HTMLElement {
+    const cells = columns.map(({ isNumber }) => make('div', { role: 'gridcell', class: isNumber ? 'is-number' : undefined }));
+    const row = make('div', { class: 'table-row', role: 'row' }, ...cells);
+    this.space.append(row);
+    return row;
+  }
+
+  private fill(element: HTMLElement, rows: Rows, place: number): void {
+    const row = this.rowAt(place);
+    element.classList.toggle('is-current', place === this.current);
+    const [low, high] = [Math.min(this.selected, this.anchor), Math.max(this.selected, this.anchor)];
+    const isSelected = this.selected >= 0 && place >= low && place <= high;
+    element.classList.toggle('is-selected', isSelected);
+    element.setAttribute('aria-selected', String(isSelected));
+    if (place === this.selected) this.grid.setAttribute('aria-activedescendant', (element.id = 'row-selected'));
+    else element.removeAttribute('id');
+    if (element.dataset.row === String(row)) return;
+    element.dataset.row = String(row);
+    element.setAttribute('aria-rowindex', String(place + 2));
+    [...element.children].forEach((cell, column) => setText(cell as HTMLElement, rows.cell(row, column)));
+  }
+
+  private click(event: MouseEvent): void {
+    const element = (event.target as Element).closest<HTMLElement>('.table-row');
+    if (element?.dataset.row === undefined || !this.rows) return;
+    const row = Number(element.dataset.row);
+    this.selected = this.placeOf(row);
+    if (!event.shiftKey) this.anchor = this.selected;
+    this.draw();
+    if (!event.shiftKey) this.onActivate(row);
+  }
+
+  private press(event: KeyboardEvent): void {
+    const page = Math.max(1, Math.floor(this.scroller.clientHeight / this.rowHeight) - 1);
+    const last = this.shownCount - 1;
+    const from = this.selected >= 0 ? this.selected : Math.max(0, this.current);
+    const places: Record<string, number> = {
+      ArrowUp: from - 1,
+      ArrowDown: this.selected >= 0 ? from + 1 : from,
+      PageUp: from - page,
+      PageDown: from + page,
+      Home: 0,
+      End: last,
+    };
+    if (event.key === 'Enter' && this.selected >= 0) this.onActivate(this.rowAt(this.selected));
+    else if (event.key in places && last >= 0) {
+      this.selected = Math.max(0, Math.min(places[event.key]!, last));
+      if (!event.shiftKey || this.anchor < 0) this.anchor = this.selected;
+      this.reveal(this.selected);
+      this.draw();
+      this.draw(); // once more where scrolling brought other rows
+    } else return;
+    event.preventDefault();
+    event.stopPropagation();
+  }
+}

@@ -1,0 +1,122 @@
+// What is known of a recording as a whole, and what is wrong with it.
+
+import { brief, bytes, clock, count, plural, titleOf } from '../model/format';
+import { idleTime } from '../model/idle';
+import type { Finding, Session } from '../model/session';
+import { byId, make } from '../ui/dom';
+import { setIcon } from '../ui/icons';
+
+type Fact = [string, string];
+
+function section(title: string, ...content: Node[]): HTMLElement {
+  return make('section', { class: 'facts' }, make('h3', {}, title), ...content);
+}
+
+function list(facts: Fact[]): HTMLElement {
+  return make('dl', {}, ...facts.flatMap(([name, value]) => [make('dt', {}, name), make('dd', {}, value)]));
+}
+
+export function showFacts(session: Session, duration: number): void {
+  byId('pane-facts').replaceChildren(
+    section('Recording', list(recordingFacts(session, duration))),
+    section('Screen', list(screenFacts(session))),
+    section('Activity', list(activityFacts(session))),
+    ...optional('Made by', creatorFacts(session)),
+    ...optional('Machine', machineFacts(session)),
+    section('Streams', streamTable(session)),
+  );
+}
+
+function optional(title: string, facts: Fact[]): Node[] {
+  return facts.length > 0 ? [section(title, list(facts))] : [];
+}
+
+function recordingFacts({ name, container, info }: Session, duration: number): Fact[] {
+  const facts: Fact[] = [['Name', name], ['Container', container], ['Length', clock(duration)]];
+  if (typeof info.bytes === 'number') facts.push(['Size', bytes(info.bytes)]);
+  for (const warning of info.warnings ?? [])
+    facts.push(['Warning', typeof warning === 'string' ? warning : JSON.stringify(warning)]);
+  return facts;
+}
+
+function screenFacts({ region, scaleFactor }: Session): Fact[] {
+  return [
+    ['Recorded region', region ? `${region.width} × ${region.height} at ${region.x}, ${region.y}` : 'not recorded'],
+    ['Scale factor', brief(scaleFactor)],
+  ];
+}
+
+function activityFacts(session: Session): Fact[] {
+  const keys = session.track('keyboardAction')?.count ?? 0;
+  const idle = idleTime(session.idle);
+  const images = new Set(session.appearances.filter(({ image }) => image.length > 0).map(({ id }) => id)).size;
+  return [
+    ['Clicks', count(session.clicks.length)],
+    ['Keys', count(keys)],
+    ['Cursor images', count(images)],
+    ['Idle', `${clock(idle, 0)} in ${plural(session.idle.length, 'stretch', 'stretches')}`],
+  ];
+}
+
+function creatorFacts({ info }: Session): Fact[] {
+  return (info.creators ?? []).map(({ name = '', version = '', platform_version = '' }) => [
+    name || 'Unknown',
+    [version && `version ${version}`, platform_version && `platform ${platform_version}`].filter(Boolean).join(', '),
+  ]);
+}
+
+const machineNames: Record<string, string> = {
+  processorCount: 'Processors',
+  activeProcessorCount: 'Active processors',
+  osVersion: 'System',
+  ram: 'Memory',
+};
+
+/// Texts such as "ProcessorCount:8" carry their own name in front.
+function machineFacts(session: Session): Fact[] {
+  const track = session.track('systemData');
+  if (!track || track.count === 0) return [];
+  return Object.entries(machineNames).map(([column, name]) => [name, track.text(column, 0).replace(/^[A-Za-z]+:/, '') || '–']);
+}
+
+function streamTable({ streams }: Session): HTMLElement {
+  const head = make('tr', {}, ...['Stream', 'Entries', 'First', 'Last', 'Bytes'].map((title) => make('th', { scope: 'col' }, title)));
+  const time = (value: number | undefined) => (value === undefined ? '–' : clock(value, 2));
+  const rows = streams.map(({ kind, uuid, entries, first, last, bytes: size, known }) =>
+    make('tr', {},
+      make('th', { scope: 'row', title: uuid }, titleOf(kind)),
+      ...[known ? count(entries) : 'unknown', time(first), time(last), count(size)].map((text) => make('td', {}, text))));
+  return make('div', { class: 'table-scroll' }, make('table', {}, make('thead', {}, head), make('tbody', {}, ...rows)));
+}
+
+function allFindings({ verify }: Session): Finding[] {
+  const ofStreams = (verify.streams ?? []).flatMap(({ kind, findings }) => (findings ?? []).map((finding) => ({ kind, ...finding })));
+  return [...(verify.findings ?? []), ...ofStreams];
+}
+
+function sentence(finding: Finding): string {
+  const text = finding.message ?? finding.text ?? finding.description;
+  return typeof text === 'string' ? text : JSON.stringify(finding);
+}
+
+/// What `verify` found.
+export function showCheck(session: Session): void {
+  const findings = allFindings(session);
+  const isDamaged = session.verify.damaged === true;
+  const verdict = make('p', { class: `verdict ${isDamaged ? 'is-bad' : 'is-good'}` },
+    make('span', {}, isDamaged ? 'This recording is damaged.' : findings.length ? 'Nothing is damaged.' : 'Nothing is wrong with this recording.'));
+  setIcon(verdict, isDamaged ? 'bad' : 'good');
+  const items = findings.map((finding) => {
+    const place = [finding.kind ?? finding.stream, typeof finding.offset === 'number' && `offset ${count(finding.offset)}`].filter(Boolean).join(', ');
+    return make('li', { class: `finding is-${finding.severity ?? 'notice'}` }, make('p', {}, sentence(finding)), make('p', { class: 'quiet' }, place));
+  });
+  byId('pane-verify').replaceChildren(verdict, ...(items.length ? [make('ul', { class: 'findings' }, ...items)] : []), coverage(session));
+  const badge = byId('finding-count');
+  badge.hidden = findings.length === 0;
+  badge.textContent = String(findings.length);
+}
+
+function coverage({ streams }: Session): HTMLElement {
+  const entries = streams.reduce((sum, stream) => sum + stream.entries, 0);
+  return make('p', { class: 'quiet' }, `${plural(streams.length, 'stream')} with ${plural(entries, 'entry', 'entries')} were checked.`);
+}

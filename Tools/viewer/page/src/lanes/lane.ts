@@ -1,0 +1,171 @@
+// One row of the timeline, and the ways in which rows are drawn.
+
+import { countBefore, countUntil } from '../model/search';
+import { shortened } from '../stage/layers';
+import type { Palette } from '../ui/palette';
+import type { Range } from './axis';
+import type { Extremes } from './extremes';
+
+export interface Lane {
+  title: string;
+  /// In pixels of the page.
+  height: number;
+  draw(canvas: LaneCanvas): void;
+  /// What holds at a time, in a few letters.
+  valueAt(time: number): string;
+}
+
+/// A lane's place on the canvas, in pixels of the page.
+export class LaneCanvas {
+  constructor(
+    readonly context: CanvasRenderingContext2D,
+    readonly palette: Palette,
+    readonly range: Range,
+    readonly width: number,
+    readonly top: number,
+    readonly height: number,
+  ) {}
+
+  x(time: number): number {
+    return ((time - this.range.from) / (this.range.to - this.range.from)) * this.width;
+  }
+
+  time(x: number): number {
+    return this.range.from + (x / this.width) * (this.range.to - this.range.from);
+  }
+}
+
+const columnWidth = 1;
+
+/// Calls `take` for each column of the canvas with the entries of its time, and the one that holds where it has none.
+export function columns(
+  canvas: LaneCanvas,
+  times: Float64Array,
+  take: (x: number, first: number, end: number) => void,
+): void {
+  let first = countBefore(times, canvas.range.from);
+  for (let x = 0; x < canvas.width; x += columnWidth) {
+    const end = nextBefore(times, first, canvas.time(x + columnWidth));
+    if (end > first) take(x, first, end);
+    else if (first > 0) take(x, first - 1, first);
+    first = end;
+  }
+}
+
+/// Like `countBefore`, for an answer that is at `start` or not far behind it.
+function nextBefore(times: Float64Array, start: number, time: number): number {
+  let reach = 1;
+  while (start + reach < times.length && times[start + reach]! < time) reach *= 2;
+  let low = start;
+  let high = Math.min(times.length, start + reach);
+  while (low < high) {
+    const middle = (low + high) >>> 1;
+    if (times[middle]! < time) low = middle + 1;
+    else high = middle;
+  }
+  return low;
+}
+
+export interface Curve {
+  times: Float64Array;
+  extremes: Extremes;
+  /// The values at the lower and the upper edge.
+  low: number;
+  high: number;
+}
+
+/// From the lower edge to the greatest value.
+export function drawArea(canvas: LaneCanvas, curve: Curve, colour: string, alpha: number): void {
+  const { context } = canvas;
+  const bottom = canvas.top + canvas.height - 1;
+  const top = new Path2D();
+  const area = new Path2D();
+  let last = -2;
+  columns(canvas, curve.times, (x, first, end) => {
+    const y = yOf(canvas, curve, curve.extremes.of(first, end)[1]);
+    if (x !== last + columnWidth) top.moveTo(x, y);
+    else top.lineTo(x, y);
+    area.rect(x, y, columnWidth, bottom - y);
+    last = x;
+  });
+  context.globalAlpha = alpha;
+  context.fillStyle = colour;
+  context.fill(area);
+  context.globalAlpha = 1;
+  context.strokeStyle = colour;
+  context.lineWidth = 1;
+  context.stroke(top);
+}
+
+/// A line that covers everything between the least and the greatest value of each column.
+export function drawLine(canvas: LaneCanvas, curve: Curve, colour: string): void {
+  const { context } = canvas;
+  const line = new Path2D();
+  let last = -2;
+  columns(canvas, curve.times, (x, first, end) => {
+    const [least, greatest] = curve.extremes.of(first, end).map((value) => yOf(canvas, curve, value)) as [number, number];
+    if (x !== last + columnWidth) line.moveTo(x, least);
+    else line.lineTo(x, least);
+    if (greatest !== least) line.lineTo(x, greatest);
+    last = x;
+  });
+  context.strokeStyle = colour;
+  context.lineWidth = 1.2;
+  context.lineJoin = 'round';
+  context.stroke(line);
+}
+
+function yOf({ top, height }: LaneCanvas, { low, high }: Curve, value: number): number {
+  const part = Math.max(0, Math.min(1, (value - low) / (high - low || 1)));
+  return top + height - 2 - part * (height - 4);
+}
+
+/// How many entries each column holds, as ticks that grow with their number.
+export function drawDensity(canvas: LaneCanvas, times: Float64Array, colour: string): void {
+  const { context } = canvas;
+  context.fillStyle = colour;
+  const step = 2;
+  const most = Math.max(3, (times.length * step * 4) / canvas.width);
+  let first = countBefore(times, canvas.range.from);
+  for (let x = 0; x < canvas.width; x += step) {
+    const end = nextBefore(times, first, canvas.time(x + step));
+    if (end > first) {
+      const height = Math.min(1, 0.3 + (0.7 * (end - first)) / most) * (canvas.height - 6);
+      context.fillRect(x, canvas.top + canvas.height - 3 - height, 1.5, height);
+    }
+    first = end;
+  }
+}
+
+export interface Band {
+  start: number;
+  end: number;
+  text: string;
+  colour: string;
+}
+
+/// Bands with names. What is narrower than a pixel stands for everything in that pixel.
+export function drawBands(canvas: LaneCanvas, times: Float64Array, band: (index: number) => Band): void {
+  const { context, palette } = canvas;
+  const end = countBefore(times, canvas.range.to);
+  context.font = '500 11px "Inter", system-ui, -apple-system, "Segoe UI", Roboto, "Liberation Sans", sans-serif';
+  context.textBaseline = 'middle';
+  for (let i = Math.max(0, countUntil(times, canvas.range.from) - 1); i < end; ) {
+    const { start, end: stop, text, colour } = band(i);
+    const x = Math.max(-4, canvas.x(start));
+    const right = Math.min(canvas.width + 4, canvas.x(stop));
+    const width = Math.max(1, right - x - 1);
+    context.fillStyle = colour;
+    context.beginPath();
+    context.roundRect(x, canvas.top + 3, width, canvas.height - 6, Math.min(3, width / 2));
+    context.fill();
+    if (width > 24 && text) drawBandText(canvas, text, Math.max(0, x) + 6, right - 7, palette.bandText);
+    i = right - x > 2 ? i + 1 : Math.max(i + 1, countBefore(times, canvas.time(x + 2)));
+  }
+}
+
+function drawBandText({ context, top, height }: LaneCanvas, text: string, left: number, right: number, colour: string): void {
+  const shown = shortened(context, text, right - left);
+  context.fillStyle = colour;
+  context.fillText(shown, left, top + height / 2 + 0.5);
+}

@@ -1,0 +1,360 @@
+// The lanes of a recording: one for each thing that was recorded.
+
+import { clickLabel, type Click } from '../model/clicks';
+import { brief } from '../model/format';
+import { keyLabel } from '../model/keys';
+import { countBefore, countUntil, lastAt } from '../model/search';
+import { rectAt, type Session } from '../model/session';
+import type { Track } from '../model/track';
+import { opacityAt } from '../stage/layers';
+import type { Palette } from '../ui/palette';
+import { Extremes } from './extremes';
+import { drawArea, drawBands, drawDensity, drawLine, type Curve, type Lane, type LaneCanvas } from './lane';
+
+export interface LaneOptions {
+  showsKeys: () => boolean;
+}
+
+export function lanesOf(session: Session, options: LaneOptions): Lane[] {
+  const lanes = [
+    slideLane(session),
+    textLane(session, 'topmostAppName', 'name', 'Application'),
+    textLane(session, 'topmostWindowTitle', 'title', 'Window'),
+    windowLane(session),
+    clickLane(session),
+    keyLane(session, options),
+    scrollLane(session),
+    speedLane(session),
+    trailLane(session),
+    hoverLane(session),
+    opacityLane(session),
+    cpuLane(session),
+  ];
+  return lanes.filter((lane): lane is Lane => lane !== undefined);
+}
+
+function filled(session: Session, kind: string): Track | undefined {
+  const track = session.track(kind);
+  return track && track.count > 0 ? track : undefined;
+}
+
+/// The same name always has the same colour.
+function colourOf(name: string, { bands }: Palette): string {
+  let hash = 7;
+  for (const character of name) hash = (Math.imul(hash, 31) + character.codePointAt(0)!) >>> 0;
+  return bands[hash % bands.length]!;
+}
+
+function textLane(session: Session, kind: string, column: string, title: string): Lane | undefined {
+  const track = filled(session, kind);
+  return track && {
+    title,
+    height: 26,
+    draw: (canvas) =>
+      drawBands(canvas, track.times, (index) => {
+        const text = track.text(column, index);
+        const colour = colourOf(appAt(session, track.times[index]!) || text, canvas.palette);
+        return { start: track.times[index]!, end: track.endOf(index, session.duration), text, colour };
+      }),
+    valueAt: (time) => textAt(track, column, time),
+  };
+}
+
+function appAt(session: Session, time: number): string {
+  const track = session.track('topmostAppName');
+  return track ? textAt(track, 'name', time) : '';
+}
+
+function textAt(track: Track, column: string, time: number): string {
+  const index = track.at(time);
+  return index >= 0 ? track.text(column, index) : '';
+}
+
+function slideLane(session: Session): Lane | undefined {
+  const kinds: [string, string][] = [['slideTitles', 'title'], ['slideText', 'text'], ['slideComment', 'comment']];
+  const [kind, column] = kinds.find(([kind]) => filled(session, kind)) ?? ['', ''];
+  const lane = textLane(session, kind, column, 'Slides');
+  const track = session.track(kind);
+  return lane && track && {
+    ...lane,
+    draw: (canvas) =>
+      drawBands(canvas, track.times, (index) => ({
+        start: track.times[index]!,
+        end: track.endOf(index, session.duration),
+        text: track.text(column, index),
+        colour: canvas.palette.bands[index % 2]!,
+      })),
+  };
+}
+
+function rectText(track: Track, time: number): string {
+  const index = track.at(time);
+  if (index < 0) return '';
+  const { x, y, width, height } = rectAt(track, index);
+  return `${width}×${height} at ${x}, ${y}`;
+}
+
+/// Shown on its own only where there are no names for its windows.
+function windowLane(session: Session): Lane | undefined {
+  const track = filled(session, 'topmostWindow');
+  if (!track || filled(session, 'topmostAppName') || filled(session, 'topmostWindowTitle')) return undefined;
+  return {
+    title: 'Window',
+    height: 26,
+    draw: (canvas) =>
+      drawBands(canvas, track.times, (index) => {
+        const text = rectText(track, track.times[index]!);
+        return {
+          start: track.times[index]!,
+          end: track.endOf(index, session.duration),
+          text,
+          colour: colourOf(text, canvas.palette),
+        };
+      }),
+    valueAt: (time) => rectText(track, time),
+  };
+}
+
+function clickLane({ clicks }: Session): Lane | undefined {
+  if (clicks.length === 0) return undefined;
+  const starts = Float64Array.from(clicks, ({ start }) => start);
+  return {
+    title: 'Clicks',
+    height: 24,
+    draw: (canvas) => {
+      const end = countBefore(starts, canvas.range.to);
+      for (let i = Math.max(0, countUntil(starts, canvas.range.from) - 4); i < end; ) {
+        drawClick(canvas, clicks[i]!);
+        i = Math.max(i + 1, countBefore(starts, canvas.time(canvas.x(starts[i]!) + 1.5)));
+      }
+    },
+    valueAt: (time) => {
+      const click = clicks[lastAt(starts, time)];
+      return click && (time < click.end || time - click.start < 0.6) ? clickLabel(click) : '';
+    },
+  };
+}
+
+function drawClick(canvas: LaneCanvas, click: Click): void {
+  const { context, top, height, palette: { accent, second } } = canvas;
+  const [x, right] = [canvas.x(click.start), canvas.x(click.end)];
+  const middle = top + height / 2;
+  context.fillStyle = click.button === 'left' ? accent : second;
+  if (right - x > 4) {
+    context.globalAlpha = 0.35;
+    context.fillRect(x, middle - 3, right - x, 6);
+    context.globalAlpha = 1;
+  }
+  context.fillRect(x - 0.75, top + 4, 1.5, height - 8);
+  context.beginPath();
+  context.arc(x, middle, 3, 0, 2 * Math.PI);
+  context.fill();
+}
+
+const roomForKeys = 15; // pixels to a key, from which on each shows what it is
+
+function keyLane(session: Session, { showsKeys }: LaneOptions): Lane | undefined {
+  const track = filled(session, 'keyboardAction');
+  return track && {
+    title: 'Keys',
+    height: 26,
+    draw: (canvas) => {
+      const first = countBefore(track.times, canvas.range.from);
+      const end = countBefore(track.times, canvas.range.to);
+      if (end - first <= canvas.width / roomForKeys) drawKeys(canvas, track, first, end, showsKeys());
+      else drawDensity(canvas, track.times, canvas.palette.accent);
+    },
+    valueAt: (time) => {
+      const index = track.at(time);
+      return index >= 0 && time - track.times[index]! < 1 ? keyLabel(track, index, showsKeys()).text : '';
+    },
+  };
+}
+
+function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number, showsKeys: boolean): void {
+  const { context, palette: { accent, accentSoft, text } } = canvas;
+  context.font = '600 11px "Inter", system-ui, -apple-system, "Segoe UI", Roboto, "Liberation Sans", sans-serif';
+  context.textBaseline = 'middle';
+  for (let i = first; i < end; ++i) {
+    const x = canvas.x(track.times[i]!);
+    const room = (i + 1 < end ? canvas.x(track.times[i + 1]!) : Infinity) - x;
+    const label = keyLabel(track, i, showsKeys).text.replace(/\[(.*)\]$/, '$1').trim() || '␣';
+    const width = Math.max(13, context.measureText(label).width + 8);
+    context.fillStyle = accent;
+    context.fillRect(x - 0.75, canvas.top + 4, 1.5, canvas.height - 8);
+    if (width > room - 1) continue;
+    context.fillStyle = accentSoft;
+    context.beginPath();
+    context.roundRect(x, canvas.top + 4, width, canvas.height - 8, [0, 3, 3, 0]);
+    context.fill();
+    context.fillStyle = text;
+    context.fillText(label, x + 4, canvas.top + canvas.height / 2 + 0.5);
+  }
+}
+
+/// A column's values as they are drawn; what is no number counts as 0.
+function valuesOf(track: Track, value: (index: number) => number): Float32Array {
+  return Float32Array.from({ length: track.count }, (_, i) => {
+    const number = value(i);
+    return Number.isFinite(number) ? number : 0;
+  });
+}
+
+/// Without the few that would flatten everything else.
+function usualGreatest(values: Float32Array): number {
+  const step = Math.max(1, Math.floor(values.length / 20000));
+  const some = values.filter((_, i) => i % step === 0 && values[i]! > 0).sort();
+  return some.length > 0 ? some[Math.floor(some.length * 0.995)]! : 1;
+}
+
+function scrollLane(session: Session): Lane | undefined {
+  const track = filled(session, 'scrollAction');
+  if (!track) return undefined;
+  const distances = valuesOf(track, (i) => track.number('y', i) || track.number('x', i));
+  const extremes = new Extremes(distances);
+  const most = Math.max(usualGreatest(distances.map(Math.abs)), 1);
+  return {
+    title: 'Scroll',
+    height: 30,
+    draw: (canvas) => drawScroll(canvas, track.times, extremes, most),
+    valueAt: (time) => {
+      const index = track.at(time);
+      if (index < 0 || time - track.times[index]! > 0.5) return '';
+      const [x, y] = [track.number('x', index), track.number('y', index)];
+      return [x && `${x > 0 ? '→' : '←'} ${Math.abs(x)}`, y && `${y > 0 ? '↑' : '↓'} ${Math.abs(y)}`].filter(Boolean).join('  ');
+    },
+  };
+}
+
+function drawScroll(canvas: LaneCanvas, times: Float64Array, extremes: Extremes, most: number): void {
+  const { context, range, top, height, palette: { grid, third } } = canvas;
+  const middle = top + height / 2;
+  context.fillStyle = grid;
+  context.fillRect(0, middle - 0.5, canvas.width, 1);
+  context.fillStyle = third;
+  let first = countBefore(times, range.from);
+  for (let x = 0; x < canvas.width; x += 2) {
+    const end = countBefore(times, canvas.time(x + 2));
+    if (end > first) {
+      const [least, greatest] = extremes.of(first, end).map((value) => Math.sign(value) * Math.min(1, Math.abs(value) / most)) as [number, number];
+      const up = (Math.max(0, greatest) * (height - 6)) / 2;
+      const down = (Math.max(0, -least) * (height - 6)) / 2;
+      context.fillRect(x, middle - up, 1.6, up + down);
+    }
+    first = end;
+  }
+}
+
+/// In units of the screen to a second.
+export function speeds(track: Track): Float32Array {
+  const result = new Float32Array(track.count);
+  for (let i = 1; i < track.count; ++i) {
+    const passed = track.times[i]! - track.times[i - 1]!;
+    const way = Math.hypot(
+      track.number('x', i) - track.number('x', i - 1),
+      track.number('y', i) - track.number('y', i - 1),
+    );
+    if (passed > 0 && Number.isFinite(way)) result[i] = way / passed;
+  }
+  return result;
+}
+
+function speedLane(session: Session): Lane | undefined {
+  const track = filled(session, 'cursorLocation');
+  if (!track) return undefined;
+  const values = speeds(track);
+  const curve = curveOf(track, values.map(Math.sqrt), 0, Math.sqrt(usualGreatest(values)));
+  return {
+    title: 'Cursor speed',
+    height: 36,
+    draw: (canvas) => drawArea(canvas, curve, canvas.palette.accent, 0.28),
+    valueAt: (time) => {
+      const index = track.at(time);
+      return index >= 0 ? `${Math.round(values[index]!)} px/s` : '';
+    },
+  };
+}
+
+function curveOf(track: Track, values: Float32Array, low: number, high: number): Curve {
+  return { times: track.times, extremes: new Extremes(values), low, high };
+}
+
+function trailLane(session: Session): Lane | undefined {
+  const track = filled(session, 'cursorLocation');
+  if (!track) return undefined;
+  const region = session.region ?? { x: 0, y: 0, width: 1920, height: 1080 };
+  const x = curveOf(track, valuesOf(track, (i) => track.number('x', i)), region.x, region.x + region.width);
+  const y = curveOf(track, valuesOf(track, (i) => -track.number('y', i)), -(region.y + region.height), -region.y);
+  return {
+    title: 'Cursor x, y',
+    height: 40,
+    draw: (canvas) => {
+      drawLine(canvas, x, canvas.palette.accent);
+      drawLine(canvas, y, canvas.palette.second);
+    },
+    valueAt: (time) => {
+      const index = track.at(time);
+      return index >= 0 ? `${track.number('x', index)}, ${track.number('y', index)}` : '';
+    },
+  };
+}
+
+/// Rectangles that stay the same are one.
+function hoverLane(session: Session): Lane | undefined {
+  const track = filled(session, 'hoverRect');
+  if (!track) return undefined;
+  const starts: number[] = [];
+  const texts: string[] = [];
+  let last = '';
+  for (let i = 0; i < track.count; ++i) {
+    const { x, y, width, height } = rectAt(track, i);
+    const text = `${width}×${height} at ${x}, ${y}`;
+    if (text === last) continue;
+    starts.push(track.times[i]!);
+    texts.push((last = text));
+  }
+  const times = Float64Array.from(starts);
+  return {
+    title: 'Hover',
+    height: 22,
+    draw: (canvas) =>
+      drawBands(canvas, times, (index) => ({
+        start: times[index]!,
+        end: times[index + 1] ?? session.duration,
+        text: texts[index]!,
+        colour: canvas.palette.bands[index % 2 ? 5 : 4]!,
+      })),
+    valueAt: (time) => texts[lastAt(times, time)] ?? '',
+  };
+}
+
+function opacityLane(session: Session): Lane | undefined {
+  const track = filled(session, 'cursorOpacity');
+  if (!track) return undefined;
+  const curve = curveOf(track, valuesOf(track, (i) => track.number('opacity', i)), 0, 1);
+  return {
+    title: 'Opacity',
+    height: 26,
+    draw: (canvas) => drawArea(canvas, curve, canvas.palette.third, 0.16),
+    valueAt: (time) => `${Math.round(opacityAt(session, time) * 100)} %`,
+  };
+}
+
+function cpuLane(session: Session): Lane | undefined {
+  const track = filled(session, 'cpuUsage');
+  if (!track) return undefined;
+  const values = valuesOf(track, (i) => track.number('cpuUsage', i));
+  const greatest = values.reduce((most, value) => Math.max(most, value), 0);
+  const high = greatest <= 1 ? 1 : Math.max(100, greatest); // a part of one, or percent
+  const curve = curveOf(track, values, 0, high);
+  return {
+    title: 'CPU usage',
+    height: 36,
+    draw: (canvas) => drawArea(canvas, curve, canvas.palette.second, 0.22),
+    valueAt: (time) => {
+      const index = track.at(time);
+      return index >= 0 ? brief(Math.round(track.number('cpuUsage', index) * 100) / 100) : '';
+    },
+  };
+}
+

@@ -1,0 +1,284 @@
+// The lanes below the movie, with one time axis, one playhead and an overview of the whole recording.
+
+import { clock, spokenTime } from '../model/format';
+import type { Session } from '../model/session';
+import { byId, fitCanvas, make, setText } from '../ui/dom';
+import { setIcon } from '../ui/icons';
+import { palette } from '../ui/palette';
+import { uiScale } from '../ui/scale';
+import { clampedRange, tickDigits, ticks, tickStep, zoomed, type Range } from './axis';
+import { dragging } from './gestures';
+import { LaneCanvas, type Lane } from './lane';
+import { lanesOf, type LaneOptions } from './lanes';
+import { Overview } from './overview';
+
+export interface TimelineEvents extends LaneOptions {
+  onSeek: (time: number) => void;
+  onRange: (range: Range) => void;
+}
+
+const rulerHeight = 26;
+const laneGap = 1;
+
+export class Timeline {
+  range: Range = { from: 0, to: 1 };
+  private session: Session | undefined;
+  private duration = 1;
+  private lanes: Lane[] = [];
+  private values: HTMLElement[] = [];
+  private isStale = true;
+  private shownTime = -1;
+  private readonly overview: Overview;
+  private readonly labels = make('div', { class: 'lane-labels' });
+  private readonly lanesCanvas = make('canvas', { class: 'lanes-canvas', 'aria-hidden': 'true' });
+  private readonly rulerCanvas = make('canvas', { class: 'ruler-canvas', 'aria-hidden': 'true' });
+  private readonly ruler = make('div', {
+    class: 'ruler',
+    role: 'slider',
+    tabindex: 0,
+    'aria-label': 'Time',
+    'aria-valuemin': 0,
+  });
+  private readonly body = make('div', { class: 'lanes-body' });
+  private readonly playhead = make('div', { class: 'playhead', 'aria-hidden': 'true' });
+  private readonly pointerLine = make('div', { class: 'pointer-line', 'aria-hidden': 'true', hidden: true });
+  private readonly tip = make('output', { class: 'tip', 'aria-live': 'off', hidden: true });
+  private readonly zoomText = make('span', { class: 'zoom-text' });
+
+  constructor(private readonly events: TimelineEvents) {
+    this.overview = new Overview((range) => this.setRange(range));
+    this.build();
+    dragging(this.ruler, { start: (x) => this.events.onSeek(this.timeAt(x)), move: (x) => this.events.onSeek(this.timeAt(x)) });
+    this.setUpLanes();
+    new ResizeObserver(() => this.invalidate()).observe(this.body);
+  }
+
+  private build(): void {
+    const root = byId('timeline');
+    const tool = (icon: string, name: string, action: () => void) => {
+      const button = make('button', { type: 'button', class: 'button is-icon is-small', 'aria-label': name, title: name });
+      setIcon(button, icon);
+      button.addEventListener('click', action);
+      return button;
+    };
+    const tools = make(
+      'div',
+      { class: 'timeline-tools' },
+      tool('minus', 'Zoom out', () => this.zoom(2)),
+      tool('plus', 'Zoom in', () => this.zoom(0.5)),
+      tool('fit', 'Show all', () => this.showAll()),
+      this.zoomText,
+    );
+    this.ruler.append(this.rulerCanvas);
+    this.body.append(this.lanesCanvas);
+    const scroll = make('div', { class: 'lanes-scroll', tabindex: 0, role: 'group', 'aria-label': 'Lanes' }, this.labels, this.body);
+    root.append(
+      make('div', { class: 'timeline-row' }, tools, this.overview.element),
+      make('div', { class: 'timeline-row' }, make('div', { class: 'ruler-label' }, 'Time'), this.ruler),
+      scroll,
+      make('div', { class: 'playhead-holder', 'aria-hidden': 'true' }, this.pointerLine, this.playhead),
+      this.tip,
+    );
+  }
+
+  show(session: Session, duration: number): void {
+    this.session = session;
+    this.duration = duration;
+    this.lanes = lanesOf(session, this.events);
+    this.values = this.lanes.map(() => make('span', { class: 'lane-value' }));
+    this.labels.replaceChildren(
+      ...this.lanes.map(({ title, height }, i) => {
+        const label = make('div', { class: 'lane-label' }, make('span', { class: 'lane-title' }, title), this.values[i]!);
+        label.style.height = `${(height + laneGap) / 16}rem`;
+        return label;
+      }),
+    );
+    this.overview.show(session, duration);
+    this.ruler.setAttribute('aria-valuemax', duration.toFixed(3));
+    this.setRange({ from: 0, to: duration });
+  }
+
+  /// A movie may be longer than what was recorded beside it.
+  setDuration(duration: number): void {
+    if (!this.session || duration === this.duration) return;
+    const showedAll = this.range.to - this.range.from >= this.duration;
+    this.duration = duration;
+    this.overview.show(this.session, duration);
+    this.ruler.setAttribute('aria-valuemax', duration.toFixed(3));
+    this.setRange(showedAll ? { from: 0, to: duration } : this.range);
+  }
+
+  setRange(range: Range): void {
+    this.range = clampedRange(range, this.duration);
+    this.isStale = true;
+    this.shownTime = -1;
+    const length = this.range.to - this.range.from;
+    setText(this.zoomText, length >= this.duration ? 'all' : length >= 10 ? clock(length, 0) : `${length.toFixed(2)} s`);
+    this.events.onRange(this.range);
+  }
+
+  showAll(): void {
+    this.setRange({ from: 0, to: this.duration });
+  }
+
+  /// Around the playhead where that is in sight.
+  zoom(factor: number): void {
+    const { from, to } = this.range;
+    const anchor = this.shownTime >= from && this.shownTime <= to ? this.shownTime : (from + to) / 2;
+    this.setRange(zoomed(this.range, anchor, factor, this.duration));
+  }
+
+  /// Brings a time into sight that is out of it.
+  reveal(time: number): void {
+    const { from, to } = this.range;
+    const length = to - from;
+    if (time < from || time > to) this.setRange({ from: time - length * 0.1, to: time + length * 0.9 });
+  }
+
+  invalidate(): void {
+    this.isStale = true;
+    this.overview.invalidate();
+    this.events.onRange(this.range);
+  }
+
+  /// Only the playhead moves, until the range is another one.
+  draw(time: number): void {
+    if (!this.session) return;
+    if (this.isStale) this.drawLanes();
+    this.overview.draw(this.range, time);
+    if (time === this.shownTime) return;
+    this.shownTime = time;
+    const x = this.xOf(time);
+    this.playhead.hidden = x < -1 || x > this.width + 1;
+    this.playhead.style.transform = `translateX(${x}px)`;
+    this.lanes.forEach((lane, i) => setText(this.values[i]!, lane.valueAt(time)));
+    this.ruler.setAttribute('aria-valuenow', time.toFixed(3));
+    this.ruler.setAttribute('aria-valuetext', spokenTime(time));
+  }
+
+  private get width(): number {
+    return this.body.clientWidth;
+  }
+
+  private xOf(time: number): number {
+    return ((time - this.range.from) / (this.range.to - this.range.from)) * this.width;
+  }
+
+  private timeAt(x: number): number {
+    const time = this.range.from + (x / Math.max(1, this.width)) * (this.range.to - this.range.from);
+    return Math.max(0, Math.min(time, this.duration));
+  }
+
+  private drawLanes(): void {
+    this.isStale = false;
+    const scale = uiScale();
+    const width = this.width / scale;
+    const height = this.lanes.reduce((sum, lane) => sum + lane.height + laneGap, 0);
+    this.lanesCanvas.style.height = `${height * scale}px`;
+    const ratio = fitCanvas(this.lanesCanvas, this.width, height * scale) * scale;
+    const context = this.lanesCanvas.getContext('2d');
+    if (!context || width <= 0) return;
+    context.setTransform(ratio, 0, 0, ratio, 0, 0);
+    context.clearRect(0, 0, width, height);
+    const whole = new LaneCanvas(context, palette(), this.range, width, 0, height);
+    this.drawBackground(whole);
+    let top = 0;
+    for (const lane of this.lanes) {
+      lane.draw(new LaneCanvas(context, palette(), this.range, width, top, lane.height));
+      context.fillStyle = palette().line;
+      context.fillRect(0, top + lane.height, width, laneGap);
+      top += lane.height + laneGap;
+    }
+    this.drawRuler(scale);
+  }
+
+  private drawBackground(canvas: LaneCanvas): void {
+    const { context, width, height, range } = canvas;
+    context.fillStyle = palette().idle;
+    for (const { start, end } of this.session?.idle ?? [])
+      if (end > range.from && start < range.to) context.fillRect(canvas.x(start), 0, canvas.x(end) - canvas.x(start), height);
+    context.fillStyle = palette().grid;
+    for (const time of ticks(range, tickStep(range, width, 84))) context.fillRect(Math.round(canvas.x(time)), 0, 1, height);
+  }
+
+  private drawRuler(scale: number): void {
+    const width = this.width / scale;
+    const ratio = fitCanvas(this.rulerCanvas, this.width, rulerHeight * scale) * scale;
+    const context = this.rulerCanvas.getContext('2d');
+    if (!context) return;
+    context.setTransform(ratio, 0, 0, ratio, 0, 0);
+    context.clearRect(0, 0, width, rulerHeight);
+    const canvas = new LaneCanvas(context, palette(), this.range, width, 0, rulerHeight);
+    const step = tickStep(this.range, width, 84);
+    context.font = '11px "Inter", system-ui, -apple-system, "Segoe UI", Roboto, "Liberation Sans", sans-serif';
+    context.textBaseline = 'middle';
+    for (const time of ticks(this.range, step / 5)) {
+      context.fillStyle = palette().line;
+      context.fillRect(Math.round(canvas.x(time)), rulerHeight - 5, 1, 5);
+    }
+    for (const time of ticks(this.range, step)) {
+      const x = Math.round(canvas.x(time));
+      context.fillStyle = palette().faint;
+      context.fillRect(x, rulerHeight - 9, 1, 9);
+      const text = clock(time, tickDigits(step));
+      if (x + 4 + context.measureText(text).width > width) continue;
+      context.fillStyle = palette().muted;
+      context.fillText(text, x + 4, 10);
+    }
+  }
+
+  /// A click goes there; dragging moves the lanes, or the time where all of it is in sight.
+  private setUpLanes(): void {
+    let started: Range = this.range;
+    const isWhole = () => started.to - started.from >= this.duration;
+    dragging(this.body, {
+      start: () => void (started = this.range),
+      click: (x) => this.events.onSeek(this.timeAt(x)),
+      move: (x, way) => {
+        if (isWhole()) return this.events.onSeek(this.timeAt(x));
+        const shift = (way / this.width) * (started.to - started.from);
+        this.setRange({ from: started.from - shift, to: started.to - shift });
+      },
+      pinch: (x, factor) => this.setRange(zoomed(this.range, this.timeAt(x), factor, this.duration)),
+    });
+    for (const element of [this.body, this.ruler, this.overview.element])
+      element.addEventListener('wheel', (event) => this.wheel(event), { passive: false });
+    this.body.addEventListener('pointermove', (event) => this.point(event));
+    this.body.addEventListener('pointerleave', () => void (this.pointerLine.hidden = this.tip.hidden = true));
+    this.body.addEventListener('dblclick', () => this.showAll());
+  }
+
+  private wheel(event: WheelEvent): void {
+    event.preventDefault();
+    const lines = event.deltaMode === WheelEvent.DOM_DELTA_LINE ? 16 : 1;
+    const isPan = event.shiftKey || Math.abs(event.deltaX) > Math.abs(event.deltaY);
+    if (isPan) {
+      const way = (event.deltaX || event.deltaY) * lines;
+      const shift = (way / Math.max(1, this.width)) * (this.range.to - this.range.from);
+      return this.setRange({ from: this.range.from + shift, to: this.range.to + shift });
+    }
+    const x = event.clientX - this.body.getBoundingClientRect().left;
+    const strength = event.ctrlKey ? 0.01 : 0.0022;
+    const isOverview = event.currentTarget === this.overview.element;
+    const anchor = isOverview ? (x / Math.max(1, this.width)) * this.duration : this.timeAt(x);
+    this.setRange(zoomed(this.range, anchor, Math.exp(event.deltaY * lines * strength), this.duration));
+  }
+
+  /// What the lane under the pointer tells at that time.
+  private point(event: PointerEvent): void {
+    if (event.pointerType === 'touch' || event.buttons !== 0) return void (this.pointerLine.hidden = this.tip.hidden = true);
+    const box = this.body.getBoundingClientRect();
+    const x = event.clientX - box.left;
+    const y = (event.clientY - box.top) / uiScale();
+    let bottom = 0;
+    const lane = this.lanes.find(({ height }) => y < (bottom += height + laneGap));
+    const time = this.timeAt(x);
+    this.pointerLine.hidden = this.tip.hidden = false;
+    this.pointerLine.style.transform = `translateX(${x}px)`;
+    const value = lane?.valueAt(time);
+    this.tip.replaceChildren(make('b', {}, clock(time)), ...(lane ? [` ${lane.title}`] : []), ...(value ? [make('i', {}, value)] : []));
+    const root = byId('timeline').getBoundingClientRect();
+    const left = Math.min(event.clientX - root.left + 12, root.width - this.tip.offsetWidth - 8);
+    this.tip.style.transform = `translate(${Math.max(4, left)}px, ${event.clientY - root.top - this.tip.offsetHeight - 10}px)`;
+  }
+}

@@ -1,0 +1,61 @@
+// Numbers and times in words.
+
+export function clock(seconds: number, digits = 3): string {
+  const sign = seconds < 0 ? '−' : '';
+  const scale = 10 ** digits;
+  const units = Math.round(Math.abs(seconds) * scale);
+  const whole = Math.floor(units / scale);
+  const fraction = digits > 0 ? '.' + String(units % scale).padStart(digits, '0') : '';
+  const hours = Math.floor(whole / 3600);
+  const minutes = Math.floor(whole / 60) % 60;
+  const rest = String(whole % 60).padStart(2, '0');
+  return hours > 0
+    ? `${sign}${hours}:${String(minutes).padStart(2, '0')}:${rest}${fraction}`
+    : `${sign}${minutes}:${rest}${fraction}`;
+}
+
+/// For people who listen: "1 hour 2 minutes 3.5 seconds".
+export function spokenTime(seconds: number): string {
+  const total = Math.round(seconds * 10) / 10;
+  const unit = (count: number, name: string) => (count ? `${count} ${name}${count === 1 ? '' : 's'}` : '');
+  const parts = [
+    unit(Math.floor(total / 3600), 'hour'),
+    unit(Math.floor(total / 60) % 60, 'minute'),
+    unit(Math.round((total % 60) * 10) / 10, 'second'),
+  ].filter(Boolean);
+  return parts.join(' ') || '0 seconds';
+}
+
+export function count(value: number): string {
+  return value.toLocaleString('en-GB');
+}
+
+export function plural(value: number, one: string, many = one + 's'): string {
+  return `${count(value)} ${value === 1 ? one : many}`;
+}
+
+export function bytes(value: number): string {
+  const units = ['bytes', 'KiB', 'MiB', 'GiB', 'TiB'];
+  let unit = 0;
+  while (value >= 1024 && unit < units.length - 1) {
+    value /= 1024;
+    ++unit;
+  }
+  return unit === 0 ? plural(value, 'byte') : `${value.toFixed(value < 10 ? 2 : 1)} ${units[unit]}`;
+}
+
+/// A kind's name as a title: "cursorLocation" is "Cursor location".
+export function titleOf(kind: string): string {
+  if (/^[0-9a-f]{8}-/.test(kind)) return kind;
+  const words = kind
+    .replace(/([a-z])([A-Z])/g, '$1 $2')
+    .toLowerCase()
+    .replace(/^cpu\b/, 'CPU');
+  return words.charAt(0).toUpperCase() + words.slice(1);
+}
+
+/// A number with as few digits as tell it apart on the screen.
+export function brief(value: number): string {
+  if (!Number.isFinite(value)) return '–';
+  return Number.isInteger(value) ? String(value) : String(Number(value.toPrecision(5)));
+}

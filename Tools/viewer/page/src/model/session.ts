@@ -1,0 +1,132 @@
+// A recording that has been read: its tracks, and what follows from them.
+
+import type { Entries, StreamSummary } from '#decoder';
+import { cursorAppearances, type Appearance } from './appearances';
+import { clicksOf, type Click } from './clicks';
+import { hasArea, type Rect } from './geometry';
+import { idleStretches, type Stretch } from './idle';
+import { captionsOf, type Caption } from './keys';
+import { markersOf } from './markers';
+import { Track } from './track';
+
+export interface Finding {
+  severity?: string;
+  message?: string;
+  [key: string]: unknown;
+}
+
+/// What the tool's reports say; everything may be missing.
+export interface FileInfo {
+  path?: string;
+  container?: string;
+  bytes?: number;
+  duration?: number | null;
+  streams?: { kind: string; uuid: string; version: number; entries: number; bytes: number; offset: number }[];
+  creators?: { name?: string; version?: string; platform_version?: string }[];
+  foreign_atoms?: unknown[];
+  warnings?: unknown[];
+}
+
+export interface FileCheck {
+  damaged?: boolean;
+  damage_count?: number;
+  notice_count?: number;
+  findings?: Finding[];
+  streams?: { kind?: string; findings?: Finding[] }[];
+}
+
+/// What comes from the decoder.
+export interface Decoded {
+  name: string;
+  container: string;
+  duration: number | undefined;
+  streams: StreamSummary[];
+  entries: Entries[];
+  info: FileInfo;
+  verify: FileCheck;
+}
+
+export class Session {
+  readonly name: string;
+  readonly container: string;
+  readonly streams: StreamSummary[];
+  readonly info: FileInfo;
+  readonly verify: FileCheck;
+  readonly region: Rect | undefined;
+  readonly scaleFactor: number;
+  /// Seconds that the metadata, or the movie by its own word, lasts.
+  readonly duration: number;
+  readonly appearances: Appearance[];
+  readonly clicks: Click[];
+  readonly markers: Float64Array;
+  readonly idle: Stretch[];
+  private readonly tracks = new Map<string, Track>();
+  private readonly captionLists = new Map<boolean, { captions: Caption[]; starts: Float64Array }>();
+
+  constructor(decoded: Decoded) {
+    this.name = decoded.name;
+    this.container = decoded.container;
+    this.streams = decoded.streams;
+    this.info = decoded.info;
+    this.verify = decoded.verify;
+    for (const entries of decoded.entries) this.tracks.set(entries.kind, new Track(entries));
+    this.region = this.recordedRegion();
+    this.scaleFactor = this.lastNumber('recordingScaleFactor', 'scaleFactor') ?? 1;
+    this.duration = this.wholeDuration(decoded.duration);
+    this.appearances = cursorAppearances(this.track('cursorImage'));
+    this.clicks = clicksOf(this.track('cursorAction'), this.duration);
+    this.markers = markersOf(this);
+    this.idle = idleStretches(this);
+  }
+
+  track(kind: string): Track | undefined {
+    return this.tracks.get(kind);
+  }
+
+  allTracks(): Track[] {
+    return [...this.tracks.values()];
+  }
+
+  captions(showsKeys: boolean): { captions: Caption[]; starts: Float64Array } {
+    let list = this.captionLists.get(showsKeys);
+    if (!list) {
+      const captions = captionsOf(this.track('keyboardAction'), showsKeys);
+      list = { captions, starts: Float64Array.from(captions, ({ start }) => start) };
+      this.captionLists.set(showsKeys, list);
+    }
+    return list;
+  }
+
+  private recordedRegion(): Rect | undefined {
+    const track = this.track('recordingRegion');
+    for (let i = (track?.count ?? 0) - 1; i >= 0; --i) {
+      const rect = rectAt(track!, i);
+      if (hasArea(rect)) return rect;
+    }
+    return undefined;
+  }
+
+  private lastNumber(kind: string, column: string): number | undefined {
+    const track = this.track(kind);
+    return track?.count ? track.number(column, track.count - 1) : undefined;
+  }
+
+  private wholeDuration(declared: number | undefined): number {
+    let end = declared && Number.isFinite(declared) && declared > 0 ? declared : 0;
+    for (const { times } of this.tracks.values())
+      if (times.length) end = Math.max(end, Math.min(times[times.length - 1]!, longest));
+    return Math.max(end, shortest);
+  }
+}
+
+const shortest = 0.1; // seconds, so that there is something to show
+const longest = 366 * 86400; // a damaged time must not squeeze everything else into nothing
+
+export function rectAt(track: Track, index: number): Rect {
+  return {
+    x: track.number('x', index),
+    y: track.number('y', index),
+    width: track.number('width', index),
+    height: track.number('height', index),
+  };
+}

@@ -1,0 +1,73 @@
+// One stream's entries in the order of their times.
+
+import type { Column, Entries } from '#decoder';
+import { lastAt } from './search';
+
+export class Track {
+  readonly kind: string;
+  /// Ascending and finite.
+  readonly times: Float64Array;
+  /// The rows of the stream, by time; null where the stream is in that order itself.
+  private readonly order: Uint32Array | null;
+
+  constructor(readonly entries: Entries) {
+    this.kind = entries.kind;
+    this.order = isSorted(entries.time) ? null : orderOf(entries.time);
+    this.times = this.order ? Float64Array.from(this.order, (row) => entries.time[row]!) : entries.time;
+  }
+
+  get count(): number {
+    return this.times.length;
+  }
+
+  /// The row in the stream of the `index`th entry by time.
+  row(index: number): number {
+    return this.order ? this.order[index]! : index;
+  }
+
+  column(name: string): Column | undefined {
+    return this.entries.columns[name];
+  }
+
+  number(name: string, index: number): number {
+    const value = this.entries.columns[name]?.[this.row(index)];
+    return typeof value === 'bigint' ? Number(value) : typeof value === 'number' ? value : NaN;
+  }
+
+  text(name: string, index: number): string {
+    const value = this.entries.columns[name]?.[this.row(index)];
+    return value === null || value === undefined ? '' : String(value);
+  }
+
+  bytes(name: string, index: number): Uint8Array | null {
+    const value = this.entries.columns[name]?.[this.row(index)];
+    return value instanceof Uint8Array ? value : null;
+  }
+
+  /// The entry that holds at `time`, or -1 before the first.
+  at(time: number): number {
+    return lastAt(this.times, time);
+  }
+
+  /// When the next entry takes over.
+  endOf(index: number, end: number): number {
+    return index + 1 < this.count ? this.times[index + 1]! : Math.max(end, this.times[index]!);
+  }
+}
+
+function isSorted(times: Float64Array): boolean {
+  let last = -Infinity;
+  for (let i = 0; i < times.length; ++i) {
+    const time = times[i]!;
+    if (!(time >= last) || time === Infinity || time === -Infinity) return false;
+    last = time;
+  }
+  return true;
+}
+
+/// Entries whose time is no number happen never.
+function orderOf(times: Float64Array): Uint32Array {
+  const rows: number[] = [];
+  for (let i = 0; i < times.length; ++i) if (Number.isFinite(times[i])) rows.push(i);
+  return Uint32Array.from(rows.sort((a, b) => times[a]! - times[b]! || a - b));
+}

@@ -1,0 +1,40 @@
+// Cursor images, decoded when they are needed.
+
+import type { Appearance } from '../model/appearances';
+
+const atOnce = 8;
+
+export class CursorImages {
+  private readonly images = new Map<Uint8Array, ImageBitmap | 'decoding' | 'failed'>();
+  onDecoded: () => void = () => {};
+
+  /// Undefined while it is being decoded, null where there is none that a browser can show.
+  image({ image }: Appearance): ImageBitmap | null | undefined {
+    if (image.length === 0) return null;
+    const known = this.images.get(image);
+    if (known === undefined) this.decode(image);
+    return known instanceof ImageBitmap ? known : known === 'failed' ? null : undefined;
+  }
+
+  /// So that they are there when they are needed.
+  async prepare(appearances: Appearance[]): Promise<void> {
+    const images = [...new Set(appearances.map(({ image }) => image))].filter(({ length }) => length > 0);
+    for (let i = 0; i < Math.min(images.length, 512); i += atOnce)
+      await Promise.all(images.slice(i, i + atOnce).map((image) => this.images.has(image) || this.decode(image)));
+  }
+
+  clear(): void {
+    for (const image of this.images.values()) if (image instanceof ImageBitmap) image.close();
+    this.images.clear();
+  }
+
+  private async decode(bytes: Uint8Array): Promise<void> {
+    this.images.set(bytes, 'decoding');
+    try {
+      this.images.set(bytes, await createImageBitmap(new Blob([bytes as BlobPart])));
+    } catch {
+      this.images.set(bytes, 'failed');
+    }
+    this.onDecoded();
+  }
+}

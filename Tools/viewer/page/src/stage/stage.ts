@@ -1,0 +1,167 @@
+// The movie, and what was recorded drawn over it.
+
+import { fitted, placementOf, type Placement, type Size } from '../model/geometry';
+import { heatHeight, heatOf, heatWidth } from '../model/heat';
+import { captionAt, type Caption } from '../model/keys';
+import { lastAt } from '../model/search';
+import type { Session } from '../model/session';
+import { byId, fitCanvas, make } from '../ui/dom';
+import { CursorImages } from './cursors';
+import {
+  drawClicks,
+  drawCursor,
+  drawHeat,
+  drawHover,
+  drawTrail,
+  drawWindow,
+  layers,
+  type LayerId,
+  type Scene,
+} from './layers';
+import type { Player } from './player';
+
+const reducedMotion = matchMedia('(prefers-reduced-motion: reduce)');
+
+export class Stage {
+  readonly images = new CursorImages();
+  placement: Placement = placementOf(undefined, 1, undefined);
+  showsKeys = false;
+  private session: Session | undefined;
+  private clickStarts = new Float64Array();
+  private shownCaption = '';
+  private heat: { picture: HTMLCanvasElement; from: number; to: number } | undefined;
+  private heatRange = { from: 0, to: 0 };
+  private width = 0;
+  private readonly element = byId('stage');
+  private readonly frame = byId('frame');
+  private readonly canvas = byId<HTMLCanvasElement>('overlay');
+  private readonly caption = byId('caption');
+
+  constructor(private readonly player: Player) {
+    new ResizeObserver(() => this.lay()).observe(this.element);
+  }
+
+  show(session: Session): void {
+    this.session = session;
+    this.clickStarts = Float64Array.from(session.clicks, ({ start }) => start);
+    this.heat = undefined;
+    this.images.clear();
+    this.lay();
+  }
+
+  /// Gives the frame the shape of the movie, or of the recorded region where there is none.
+  lay(): void {
+    if (!this.session) return;
+    const { video, movie } = this.player;
+    const size: Size | undefined =
+      movie === 'ready' ? { width: video.videoWidth, height: video.videoHeight } : undefined;
+    this.placement = placementOf(this.session.region, this.session.scaleFactor, size);
+    const place = fitted(this.placement.frame, { width: this.element.clientWidth, height: this.element.clientHeight });
+    Object.assign(this.frame.style, {
+      left: `${place.x}px`,
+      top: `${place.y}px`,
+      width: `${place.width}px`,
+      height: `${place.height}px`,
+    });
+    this.width = place.width;
+    this.frame.classList.toggle('has-movie', movie === 'ready');
+    fitCanvas(this.canvas, place.width, place.height);
+    this.shownCaption = '';
+    this.draw(this.player.time);
+  }
+
+  /// The heat map tells of this range of time.
+  setHeatRange(from: number, to: number): void {
+    this.heatRange = { from, to };
+  }
+
+  draw(time: number): void {
+    const { session, canvas } = this;
+    const context = canvas.getContext('2d');
+    if (!session || !context || this.width <= 0) return;
+    const { frame } = this.placement;
+    context.setTransform(1, 0, 0, 1, 0, 0);
+    context.clearRect(0, 0, canvas.width, canvas.height);
+    context.setTransform(canvas.width / frame.width, 0, 0, canvas.height / frame.height, 0, 0);
+    const scene: Scene = {
+      session,
+      placement: this.placement,
+      time,
+      unit: frame.width / this.width,
+      images: this.images,
+      clickStarts: this.clickStarts,
+      accent: '#4f8cff',
+      isStill: reducedMotion.matches,
+    };
+    this.drawLayers(context, scene);
+    this.showCaption(time);
+  }
+
+  private drawLayers(context: CanvasRenderingContext2D, scene: Scene): void {
+    const isOn = (id: LayerId) => layers.some((layer) => layer.id === id && layer.isOn);
+    if (isOn('heat')) drawHeat(context, scene, this.heatPicture());
+    if (isOn('window')) drawWindow(context, scene);
+    if (isOn('hover')) drawHover(context, scene);
+    if (isOn('trail') && !scene.isStill) drawTrail(context, scene);
+    if (isOn('clicks')) drawClicks(context, scene);
+    if (isOn('cursor')) drawCursor(context, scene);
+  }
+
+  private heatPicture(): HTMLCanvasElement {
+    const { from, to } = this.heatRange;
+    if (this.heat && this.heat.from === from && this.heat.to === to) return this.heat.picture;
+    const heat = heatOf(this.session?.track('cursorLocation'), this.placement, from, to);
+    const picture = make('canvas', { width: heatWidth, height: heatHeight });
+    picture.getContext('2d')?.putImageData(new ImageData(heatColours(heat), heatWidth, heatHeight), 0, 0);
+    this.heat = { picture, from, to };
+    return picture;
+  }
+
+  /// What is typed at the moment, as far as the reader may see it.
+  captionAt(time: number): Caption | undefined {
+    if (!this.session || !layers.some(({ id, isOn }) => id === 'captions' && isOn)) return undefined;
+    const { captions, starts } = this.session.captions(this.showsKeys);
+    return captionAt(captions, lastAt(starts, time), time);
+  }
+
+  private showCaption(time: number): void {
+    const caption = this.captionAt(time);
+    const text = caption?.text ?? '';
+    if (text === this.shownCaption) return;
+    this.shownCaption = text;
+    this.caption.style.fontSize = `${Math.max(12, Math.min(34, this.width * 0.024))}px`;
+    this.caption.hidden = !caption;
+    this.caption.dataset.text = text;
+    this.caption.replaceChildren(...captionParts(caption));
+  }
+}
+
+/// Running text as it is, other keys as caps.
+function captionParts(caption: Caption | undefined): Node[] {
+  const parts: HTMLElement[] = [];
+  for (const { label } of caption?.keys ?? []) {
+    const last = parts[parts.length - 1];
+    if (label.isTyped && last?.tagName === 'SPAN') last.textContent += label.text;
+    else if (label.isTyped) parts.push(make('span', {}, label.text));
+    else parts.push(make('kbd', {}, label.text.replace(/\[(.*)\]$/, '$1')));
+  }
+  return parts;
+}
+
+const heatStops: [number, number, number, number][] = [
+  [40, 70, 220, 0],
+  [50, 110, 255, 110],
+  [40, 200, 190, 150],
+  [250, 210, 70, 180],
+  [250, 80, 50, 205],
+];
+
+function heatColours(heat: Float32Array): Uint8ClampedArray<ArrayBuffer> {
+  const pixels = new Uint8ClampedArray(heat.length * 4);
+  heat.forEach((value, i) => {
+    const place = Math.min(0.9999, value) * (heatStops.length - 1);
+    const [from, to] = [heatStops[Math.floor(place)]!, heatStops[Math.floor(place) + 1]!];
+    for (let k = 0; k < 4; ++k) pixels[i * 4 + k] = from[k]! + (to[k]! - from[k]!) * (place % 1);
+  });
+  return pixels;
+}

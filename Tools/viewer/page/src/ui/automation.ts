@@ -1,0 +1,49 @@
+// For scripts that drive the page: where it is, what it shows, and what was decoded.
+
+import type { App } from '../app';
+import { screenToVideo } from '../model/geometry';
+import { cursorPosition, opacityAt } from '../stage/layers';
+
+export interface ViewerState {
+  isOpen: boolean;
+  time: number;
+  duration: number;
+  playing: boolean;
+  movie: string;
+  frame: { width: number; height: number };
+  /// In pixels of the movie.
+  hotSpot: { x: number; y: number } | null;
+  opacity: number;
+  caption: string;
+}
+
+declare global {
+  var zulmViewer: {
+    seek(time: number): void;
+    state(): ViewerState;
+    dump(): Promise<string>;
+  };
+}
+
+function stateOf({ session, player, stage }: App): ViewerState {
+  const position = session && cursorPosition(session, player.time);
+  return {
+    isOpen: session !== undefined,
+    time: player.time,
+    duration: player.duration,
+    playing: player.playing,
+    movie: player.movie,
+    frame: stage.placement.frame,
+    hotSpot: position ? screenToVideo(position, stage.placement) : null,
+    opacity: session ? opacityAt(session, player.time) : 1,
+    caption: stage.captionAt(player.time)?.text ?? '',
+  };
+}
+
+export function setUpAutomation(app: App): void {
+  globalThis.zulmViewer = {
+    seek: (time) => app.seek(time),
+    state: () => stateOf(app),
+    dump: () => app.decoder.dump(),
+  };
+}

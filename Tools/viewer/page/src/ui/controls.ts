@@ -1,0 +1,84 @@
+// The buttons below the movie.
+
+import type { App } from '../app';
+import { clock } from '../model/format';
+import { layers } from '../stage/layers';
+import { byId, make, setText } from './dom';
+import { setIcon } from './icons';
+
+export interface Controls {
+  showState(): void;
+  showTime(time: number, duration: number): void;
+}
+
+const rates = [0.25, 0.5, 1, 1.5, 2, 4];
+
+export function setUpControls(app: App): Controls {
+  const on = (id: string, action: () => void) => byId(id).addEventListener('click', action);
+  on('play', () => app.player.toggle());
+  on('frame-back', () => app.stepFrame(-1));
+  on('frame-forward', () => app.stepFrame(1));
+  on('marker-back', () => app.stepMarker(-1));
+  on('marker-forward', () => app.stepMarker(1));
+  on('rate', () => (app.player.rate = rates[(rates.indexOf(app.player.rate) + 1) % rates.length]!));
+  on('sound', () => (app.player.muted = !app.player.muted));
+  on('keys-button', () => app.switchKeys());
+  on('full-screen', () => void switchFullScreen());
+  byId('frame').addEventListener('click', () => app.player.toggle());
+  const boxes = setUpLayers(app);
+  return { showState: () => showState(app, boxes), showTime };
+}
+
+export async function switchFullScreen(): Promise<void> {
+  try {
+    if (document.fullscreenElement) await document.exitFullscreen();
+    else await document.querySelector('.stage-area')!.requestFullscreen();
+  } catch {
+    // not allowed here: nothing changes
+  }
+}
+
+function setUpLayers(app: App): HTMLInputElement[] {
+  const button = byId('layers-button');
+  const menu = byId('layers-menu');
+  const boxes = layers.map(({ id, name, key }) => {
+    const box = make('input', { type: 'checkbox', class: 'switch', role: 'switch' });
+    box.addEventListener('change', () => app.switchLayer(id));
+    menu.append(make('label', { class: 'menu-item' }, make('span', {}, name), make('kbd', {}, key), box));
+    return box;
+  });
+  const show = (isOpen: boolean) => {
+    menu.hidden = !isOpen;
+    button.setAttribute('aria-expanded', String(isOpen));
+  };
+  button.addEventListener('click', () => show(menu.hidden));
+  document.addEventListener('pointerdown', (event) => {
+    if (!(event.target as Element).closest('.menu-holder')) show(false);
+  });
+  menu.parentElement!.addEventListener('keydown', (event) => {
+    if (event.key !== 'Escape' || menu.hidden) return;
+    show(false);
+    button.focus();
+    event.stopPropagation();
+  });
+  return boxes;
+}
+
+function showState({ player, stage }: App, boxes: HTMLInputElement[]): void {
+  setIcon(byId('play'), player.playing ? 'pause' : 'play');
+  byId('play').setAttribute('aria-label', player.playing ? 'Pause' : 'Play');
+  setText(byId('rate'), `${player.rate}×`);
+  byId('rate').setAttribute('aria-label', `Speed ${player.rate}`);
+  setIcon(byId('sound'), player.muted ? 'soundOff' : 'sound');
+  byId('sound').setAttribute('aria-pressed', String(!player.muted));
+  byId<HTMLButtonElement>('sound').disabled = player.movie !== 'ready';
+  setIcon(byId('keys-button'), stage.showsKeys ? 'shown' : 'masked');
+  byId('keys-button').setAttribute('aria-pressed', String(stage.showsKeys));
+  byId('keys-button').setAttribute('aria-label', 'Show typed keys');
+  layers.forEach(({ isOn }, i) => (boxes[i]!.checked = isOn));
+}
+
+function showTime(time: number, duration: number): void {
+  setText(byId('clock-time'), clock(time));
+  setText(byId('clock-total'), ` / ${clock(duration, 0)}`);
+}

@@ -1,0 +1,66 @@
+// One HTML file with everything inside: the script, the styles and the decoder, which runs in a worker made from text.
+//
+// ZULM_DECODER names the JavaScript module that decodes recordings; without it the page is built around the
+// synthetic recording of the tests.
+
+import { createHash } from 'node:crypto';
+import { fileURLToPath } from 'node:url';
+import { defineConfig, type Plugin } from 'vite';
+
+const decoder = process.env.ZULM_DECODER ?? fileURLToPath(new URL('test/decoder.ts', import.meta.url));
+
+function policy(script: string, style: string): string {
+  const hash = (text: string) => `'sha256-${createHash('sha256').update(text).digest('base64')}'`;
+  return [
+    "default-src 'none'",
+    `script-src ${hash(script)} 'wasm-unsafe-eval' blob:`,
+    `style-src ${hash(style)}`,
+    'worker-src blob:',
+    "connect-src 'none'",
+    "img-src blob: data:",
+    "media-src 'self' file: blob: data:",
+    "base-uri 'none'",
+    "form-action 'none'",
+  ].join('; ');
+}
+
+/// Puts the script and the styles into the page, with a policy that lets nothing else run.
+function inline(): Plugin {
+  return {
+    name: 'inline',
+    enforce: 'post',
+    generateBundle(_, bundle) {
+      const files = Object.values(bundle);
+      const page = files.find((file) => file.fileName.endsWith('.html'));
+      const chunk = files.find((file) => file.type === 'chunk');
+      const sheet = files.find((file) => file.fileName.endsWith('.css'));
+      if (page?.type !== 'asset' || chunk?.type !== 'chunk' || sheet?.type !== 'asset')
+        throw new Error('the page needs exactly one script and one style sheet');
+      const script = `\n${chunk.code.trim().replaceAll('</script', '<\\/script').replaceAll('<!--', '<\\!--')}\n`;
+      const style = `\n${String(sheet.source).trim()}\n`;
+      page.source = String(page.source)
+        .replace(/\s*<script type="module"[^>]*><\/script>/, '')
+        .replace(/\s*<link rel="stylesheet"[^>]*>/, () => `\n<style>${style}</style>`)
+        .replace('POLICY', () => policy(script, style))
+        .replace('</body>', () => `<script type="module">${script}</script>\n</body>`);
+      for (const file of [chunk, sheet]) delete bundle[file.fileName];
+      if (Object.keys(bundle).length !== 1)
+        throw new Error(`not everything is inside the page: ${Object.keys(bundle).join(', ')}`);
+    },
+  };
+}
+
+export default defineConfig({
+  base: './',
+  publicDir: false,
+  resolve: { alias: { '#decoder': decoder } },
+  worker: { format: 'es' },
+  build: {
+    target: 'es2022',
+    assetsInlineLimit: Number.MAX_SAFE_INTEGER,
+    cssCodeSplit: false,
+    modulePreload: false,
+    chunkSizeWarningLimit: 8192,
+  },
+  plugins: [inline()],
+});
