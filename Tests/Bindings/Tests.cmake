@@ -1,0 +1,18 @@
+zulm_add_test(Bindings/CInterfaceTest)
+target_link_libraries(Bindings.CInterfaceTest PRIVATE zulmetadata_c ZULMetaDataToolTestSupport ZULMetaDataInvalidCorpus)
+add_test(NAME Bindings/HeaderIsC
+  COMMAND ${CMAKE_CXX_COMPILER} -x c -std=c99 -pedantic -Wall -Wextra -Werror -fsyntax-only
+    ${PROJECT_SOURCE_DIR}/Bindings/JavaScript/zulmetadata_c.h)
+zulm_add_test(Bindings/SliceBufferTest)
+target_link_libraries(Bindings.SliceBufferTest PRIVATE zulmetadata_c)
+
+# The module for JavaScript, where it is built.
+if(ZULM_VIEWER)
+  foreach(test IN ITEMS hostile package recording slices)
+    add_test(NAME JavaScript/${test}
+      COMMAND ${CMAKE_COMMAND} -E env ZULM_PATH=${ZULM_PATH} ZULM_PACKAGE=${ZULMETADATA_PACKAGE}
+        ZULM_TEST_DATA=${CMAKE_CURRENT_SOURCE_DIR}/Data
+        ${NODE} --test ${CMAKE_CURRENT_SOURCE_DIR}/Bindings/JavaScript/${test}.test.mjs)
+    set_tests_properties(JavaScript/${test} PROPERTIES TIMEOUT 300)
+  endforeach()
+endif()
