@@ -1,6 +1,7 @@
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include "ZULMetaData/ContainerScan.h"
+#include "ZULMetaData/FileInputBuffer.h"
 #include "ZULMetaData/PositionedInput.h"
 
 #include <algorithm>
@@ -23,20 +24,27 @@ std::string extensionOf(const std::string& path) {
 
 class MetaDataFileParser final : public MetaDataParser {
 public:
-    explicit MetaDataFileParser(const std::string& path) : path_(path), type_(streamTypeOf(path)) {
-        fileOpen(file_, path_.c_str(), std::ios_base::in | std::ios_base::binary);
+    explicit MetaDataFileParser(const std::string& path) : type_(streamTypeOf(path)), buffer_(*file_.rdbuf()) {
+        stream().rdbuf(&buffer_);
+        fileOpen(file_, path.c_str(), std::ios_base::in | std::ios_base::binary);
     }
 
     bool isOpen() const { return file_.is_open(); }
 
     StreamType getStreamType() const override { return type_; }
     std::istream& getStream() override { return file_; }
-    void close() override { file_.close(); }
+    void close() override {
+        file_.close();
+        buffer_.forget();
+    }
 
 private:
-    std::string path_;
+    /// Only as such can it be given another buffer.
+    std::istream& stream() { return file_; }
+
     StreamType type_;
     std::ifstream file_;
+    detail::FileInputBuffer buffer_;
 };
 
 class MetaDataStreamParser final : public MetaDataParser {

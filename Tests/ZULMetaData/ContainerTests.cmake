@@ -1,4 +1,5 @@
 zulm_add_test(ZULMetaData/AtomRepairTest)
+zulm_add_test(ZULMetaData/FileInputBufferTest)
 zulm_add_test(ZULMetaData/ContainerScanTest)
 zulm_add_test(ZULMetaData/MP4MetaDataTest)
 zulm_add_test(ZULMetaData/MetaDataParserTest)
