@@ -55,17 +55,26 @@ bool readChunk(detail::PositionedInput& input, ContainerItem& chunk) {
 
 /// `endOf` gives where the next item begins.
 template <class Read, class EndOf>
-std::vector<ContainerItem> listItems(detail::PositionedInput input, std::uint64_t end, Read read, EndOf endOf) {
-    std::vector<ContainerItem> items;
+void visitItems(detail::PositionedInput input, std::uint64_t end, Read read, EndOf endOf,
+                const ContainerVisitor& visit) {
     while (input.position() < end && input.position() < input.total()) {
         ContainerItem item;
-        if (!read(input, item))
+        if (!read(input, item) || !visit(item))
             break;
-        items.push_back(item);
         const std::uint64_t next = endOf(item);
         if (next <= item.offset || !input.moveTo(next))
             break;
     }
+}
+
+/// What `visitEach` hands to its visitor.
+template <class VisitEach>
+std::vector<ContainerItem> listOf(VisitEach visitEach) {
+    std::vector<ContainerItem> items;
+    visitEach([&](const ContainerItem& item) {
+        items.push_back(item);
+        return true;
+    });
     return items;
 }
 
@@ -87,26 +96,40 @@ bool ContainerItem::holdsRecordingInfo() const {
     return type == fourCharacters(swapInt(detail::s_recordingInfoAtom));
 }
 
+void visitAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
+                const ContainerVisitor& visit) {
+    visitItems(
+        inputAt(stream, begin, total), end, readAtom, [](const ContainerItem& atom) { return atom.end(); }, visit);
+}
+
+void visitChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
+                 const ContainerVisitor& visit) {
+    visitItems(
+        inputAt(stream, begin, total), end, readChunk,
+        [](const ContainerItem& chunk) { return chunk.end() + chunk.size % 2; }, visit);
+}
+
+void visitTopLevel(std::istream& stream, MetaDataParser::StreamType type, const ContainerVisitor& visit) {
+    stream.clear();
+    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+    if (type == MetaDataParser::QuickTime)
+        visitAtoms(stream, 0, s_anywhere, total, visit);
+    else if (type == MetaDataParser::Riff)
+        visitChunks(stream, 0, s_anywhere, total, visit);
+}
+
 std::vector<ContainerItem> listAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end,
                                      std::uint64_t total) {
-    return listItems(inputAt(stream, begin, total), end, readAtom,
-                     [](const ContainerItem& atom) { return atom.end(); });
+    return listOf([&](const ContainerVisitor& visit) { visitAtoms(stream, begin, end, total, visit); });
 }
 
 std::vector<ContainerItem> listChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end,
                                       std::uint64_t total) {
-    return listItems(inputAt(stream, begin, total), end, readChunk,
-                     [](const ContainerItem& chunk) { return chunk.end() + chunk.size % 2; });
+    return listOf([&](const ContainerVisitor& visit) { visitChunks(stream, begin, end, total, visit); });
 }
 
 std::vector<ContainerItem> listTopLevel(std::istream& stream, MetaDataParser::StreamType type) {
-    stream.clear();
-    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
-    switch (type) {
-    case MetaDataParser::QuickTime: return listAtoms(stream, 0, s_anywhere, total);
-    case MetaDataParser::Riff: return listChunks(stream, 0, s_anywhere, total);
-    default: return {};
-    }
+    return listOf([&](const ContainerVisitor& visit) { visitTopLevel(stream, type, visit); });
 }
 
 } // namespace ZULMetaData

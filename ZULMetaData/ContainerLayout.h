@@ -6,6 +6,7 @@
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <cstdint>
+#include <functional>
 #include <istream>
 #include <string>
 #include <vector>
@@ -34,14 +35,24 @@ struct ContainerItem {
     std::uint64_t payloadSize() const { return size < headerSize ? 0 : size - headerSize; }
 };
 
+/// Gets one item after the other and ends the walk by false. The stream stands anywhere meanwhile and must be left
+/// there.
+using ContainerVisitor = std::function<bool(const ContainerItem&)>;
+
 /// The items between `begin` and `end` of `stream`, which holds `total` bytes. Ends with the first item that nothing
 /// can follow: one with an open end, one whose end no file position can hold, or one that reaches beyond the total.
-/// Both clear the stream's state first.
+/// All of these clear the stream's state first.
+void visitAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
+                const ContainerVisitor& visit);
+void visitChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
+                 const ContainerVisitor& visit);
 std::vector<ContainerItem> listAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total);
 std::vector<ContainerItem> listChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end,
                                       std::uint64_t total);
 
-/// The items at the top of a container; none where `type` is a bare stream or unknown.
+/// The items at the top of a container; none where `type` is a bare stream or unknown. A movie may hold hundreds of
+/// thousands: visiting them keeps none.
+void visitTopLevel(std::istream& stream, MetaDataParser::StreamType type, const ContainerVisitor& visit);
 std::vector<ContainerItem> listTopLevel(std::istream& stream, MetaDataParser::StreamType type);
 
 } // namespace ZULMetaData

@@ -10,10 +10,16 @@ namespace ZULMetaData {
 
 namespace {
 
-const ContainerItem* findType(const std::vector<ContainerItem>& items, std::string_view type) {
-    const auto found =
-        std::find_if(items.begin(), items.end(), [&](const ContainerItem& item) { return item.type == type; });
-    return found == items.end() ? nullptr : &*found;
+/// For `visitEach` to hand its items to.
+template <class VisitEach>
+std::optional<ContainerItem> firstOfType(std::string_view type, VisitEach visitEach) {
+    std::optional<ContainerItem> found;
+    visitEach([&](const ContainerItem& item) {
+        if (item.type == type)
+            found = item;
+        return !found;
+    });
+    return found;
 }
 
 /// [version: 1][flags: 3][created][changed][timescale: 4][duration], where version 1 has 64 bits for the two times and
@@ -37,13 +43,14 @@ std::optional<double> movieDuration(MetaDataParser& movie) {
     if (movie.getStreamType() != MetaDataParser::QuickTime)
         return std::nullopt;
     std::istream& stream = movie.getStream();
-    const auto topLevel = listTopLevel(stream, MetaDataParser::QuickTime);
-    const ContainerItem* moov = findType(topLevel, "moov");
+    const auto moov = firstOfType(
+        "moov", [&](const ContainerVisitor& visit) { visitTopLevel(stream, MetaDataParser::QuickTime, visit); });
     if (!moov)
         return std::nullopt;
     const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
-    const auto children = listAtoms(stream, moov->payloadOffset(), moov->end(), std::min(total, moov->end()));
-    const ContainerItem* header = findType(children, "mvhd");
+    const auto header = firstOfType("mvhd", [&](const ContainerVisitor& visit) {
+        visitAtoms(stream, moov->payloadOffset(), moov->end(), std::min(total, moov->end()), visit);
+    });
     if (!header)
         return std::nullopt;
     stream.clear();

@@ -5,12 +5,16 @@
 namespace ZULMetaData {
 
 std::vector<ZCAPHeader> readRecordingInfo(MetaDataParser& movie) {
-    std::vector<ZCAPHeader> infos;
+    std::vector<ContainerItem> atoms;
     std::istream& stream = movie.getStream();
-    for (const ContainerItem& atom : listTopLevel(stream, movie.getStreamType())) {
+    visitTopLevel(stream, movie.getStreamType(), [&](const ContainerItem& atom) {
+        if (atom.type == "ZULR" && atom.payloadSize() >= sizeof(ZCAPHeader))
+            atoms.push_back(atom);
+        return true;
+    });
+    std::vector<ZCAPHeader> infos;
+    for (const ContainerItem& atom : atoms) {
         ZCAPHeader info;
-        if (atom.type != "ZULR" || atom.payloadSize() < sizeof info)
-            continue;
         stream.clear();
         stream.seekg(static_cast<std::streamoff>(atom.payloadOffset()));
         if (stream.read(reinterpret_cast<char*>(&info), sizeof info))

@@ -61,7 +61,7 @@ FileInfo inspect(Recording& recording) {
             read(movieDuration(recording.parser())),
             recording.streams(),
             read(readRecordingInfo(recording.parser())),
-            read(layoutOf(recording)),
+            read(layoutOf(recording, LayoutPart::MetaData)),
             validation.allFindings(),
             validation.isDamaged()};
 }

@@ -17,28 +17,33 @@ namespace {
 /// One list of items and the bytes that they should fill.
 class Walk {
 public:
-    Walk(MetaDataParser& parser, Layout& layout) : parser_(parser), layout_(layout) {}
+    Walk(MetaDataParser& parser, LayoutPart part, Layout& layout) : parser_(parser), part_(part), layout_(layout) {}
 
     std::vector<LayoutItem> items(std::uint64_t begin, std::uint64_t end, bool isInsideMetaData) {
         const std::uint64_t firstEnd = layout_.ends.size();
         std::vector<LayoutItem> items;
         std::uint64_t position = begin;
-        for (const ContainerItem& found : listed(begin, end)) {
-            items.push_back(entryFor(found, isInsideMetaData));
-            position = behind(items.back());
-            if (const std::string reason = reasonToEnd(items.back(), end, isInsideMetaData); !reason.empty()) {
+        visit(begin, end, [&](const ContainerItem& found) {
+            LayoutItem item = entryFor(found, isInsideMetaData);
+            position = behind(item);
+            const std::string reason = reasonToEnd(item, end, isInsideMetaData);
+            if (!reason.empty())
                 layout_.ends.push_back({found.offset, reason});
-                break;
-            }
-        }
+            if (isInsideMetaData || item.isMetaData || part_ == LayoutPart::Whole)
+                items.push_back(std::move(item));
+            return reason.empty();
+        });
         const bool isFilled = position >= end || layout_.ends.size() > firstEnd;
         if (!isFilled)
             layout_.ends.push_back(
                 {position, fmt::format("{} bytes are left, too few for another header", end - position)});
-        for (LayoutItem& item : items)
+        for (LayoutItem& item : items) {
             if (item.isMetaData)
                 item.children =
                     this->items(item.item.payloadOffset(), std::min(item.item.offset + item.size, end), true);
+            else if (isInsideMetaData && !item.isForeign)
+                item.stream = streamAt(item.item.payloadOffset());
+        }
         return items;
     }
 
@@ -46,10 +51,8 @@ private:
     bool isMovie() const { return parser_.getStreamType() == MetaDataParser::QuickTime; }
     const char* what() const { return isMovie() ? "atom" : "chunk"; }
 
-    std::vector<ContainerItem> listed(std::uint64_t begin, std::uint64_t end) {
-        std::istream& stream = parser_.getStream();
-        return isMovie() ? listAtoms(stream, begin, end, layout_.fileSize)
-                         : listChunks(stream, begin, end, layout_.fileSize);
+    void visit(std::uint64_t begin, std::uint64_t end, const ContainerVisitor& visitor) {
+        (isMovie() ? visitAtoms : visitChunks)(parser_.getStream(), begin, end, layout_.fileSize, visitor);
     }
 
     LayoutItem entryFor(const ContainerItem& found, bool isInsideMetaData) {
@@ -57,11 +60,8 @@ private:
         entry.item = found;
         entry.isOpenEnded = isMovie() && found.sizeField == 0;
         entry.size = entry.isOpenEnded ? layout_.fileSize - found.offset : found.size;
-        const bool isStream = isInsideMetaData && found.holdsStream();
         entry.isMetaData = !isInsideMetaData && found.holdsMetaData() && !entry.isOpenEnded;
-        entry.isForeign = isInsideMetaData && !isStream;
-        if (isStream)
-            entry.stream = streamAt(found.payloadOffset());
+        entry.isForeign = isInsideMetaData && !found.holdsStream();
         return entry;
     }
 
@@ -101,6 +101,7 @@ private:
     }
 
     MetaDataParser& parser_;
+    LayoutPart part_;
     Layout& layout_;
 };
 
@@ -112,12 +113,12 @@ std::string LayoutItem::headerForm() const {
     return item.isExtended() ? "extended" : "32-bit";
 }
 
-Layout layoutOf(Recording& recording) {
+Layout layoutOf(Recording& recording, LayoutPart part) {
     MetaDataParser& parser = recording.parser();
     Layout layout;
     layout.fileSize = recording.size();
     if (parser.getStreamType() != MetaDataParser::RawStream)
-        layout.items = Walk(parser, layout).items(0, layout.fileSize, false);
+        layout.items = Walk(parser, part, layout).items(0, layout.fileSize, false);
     return layout;
 }
 

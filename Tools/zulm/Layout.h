@@ -39,7 +39,10 @@ struct Layout {
     std::vector<LayoutEnd> ends; ///< none where everything is filled; those inside metadata atoms too
 };
 
+/// Which items are kept. A movie may hold hundreds of thousands that hold no metadata.
+enum class LayoutPart { Whole, MetaData };
+
 /// No items for a bare stream. Throws `Failure` where the file cannot be read.
-Layout layoutOf(Recording& recording);
+Layout layoutOf(Recording& recording, LayoutPart part = LayoutPart::Whole);
 
 } // namespace Zulm
