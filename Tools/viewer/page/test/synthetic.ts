@@ -178,9 +178,13 @@ function machine(duration: number): Entries[] {
   ];
 }
 
-/// An arrow of 8 by 8 pixels, black in white, as a PNG file.
+/// An arrow of 24 by 24 pixels, black in white, as a PNG file.
 const arrow = Uint8Array.from(
-  atob('iVBORw0KGgoAAAANSUhEUgAAAAgAAAAICAYAAADED76LAAAAJ0lEQVR4nGNgYGD4D8VYwX98CrBKIAui0FgVIOvEUABnYzMSqwJkmgEATEQ1yzV5mvAAAAAASUVORK5CYII='),
+  atob(
+    'iVBORw0KGgoAAAANSUhEUgAAABgAAAAYCAQAAABKfvVzAAAAZElEQVR42sXTSQ7AIAwDQP//06YUoUBZYp/qKxmBQgI+gRPS' +
+    'JKRJ3mKHNGCQDmQSQCQjkMgMBPIFKVlBQk7gSHbgStYuRfKfpjBZY6Hc1lYkjmE8Qbwjju25BUhzneztqwS/pwBGSRf3Fj6W' +
+    'QgAAAABJRU5ErkJggg==',
+  ),
   (character) => character.charCodeAt(0),
 );
 
@@ -199,8 +203,8 @@ function cursorImage(duration: number): Entries {
   return entries('cursorImage', time, {
     image,
     id: BigInt64Array.from(id),
-    hotspotOffsetX: new Int32Array(time.length),
-    hotspotOffsetY: new Int32Array(time.length),
+    hotspotOffsetX: Int32Array.from(image, (bytes) => (bytes ? 1 : 0)),
+    hotspotOffsetY: Int32Array.from(image, (bytes) => (bytes ? 1 : 0)),
   });
 }
 

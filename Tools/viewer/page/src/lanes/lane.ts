@@ -88,10 +88,12 @@ export function drawArea(canvas: LaneCanvas, curve: Curve, colour: string, alpha
     area.rect(x, y, columnWidth, bottom - y);
     last = x;
   });
-  context.globalAlpha = alpha;
+  const isCrowded = countBefore(curve.times, canvas.range.to) - countBefore(curve.times, canvas.range.from) > 4 * canvas.width;
+  context.globalAlpha = isCrowded ? 2.2 * alpha : alpha;
   context.fillStyle = colour;
   context.fill(area);
   context.globalAlpha = 1;
+  if (isCrowded) return;
   context.strokeStyle = colour;
   context.lineWidth = 1;
   context.stroke(top);
@@ -109,10 +111,12 @@ export function drawLine(canvas: LaneCanvas, curve: Curve, colour: string): void
     if (greatest !== least) line.lineTo(x, greatest);
     last = x;
   });
+  context.globalAlpha = 0.7;
   context.strokeStyle = colour;
   context.lineWidth = 1.2;
   context.lineJoin = 'round';
   context.stroke(line);
+  context.globalAlpha = 1;
 }
 
 function yOf({ top, height }: LaneCanvas, { low, high }: Curve, value: number): number {
@@ -148,7 +152,7 @@ export interface Band {
 export function drawBands(canvas: LaneCanvas, times: Float64Array, band: (index: number) => Band): void {
   const { context, palette } = canvas;
   const end = countBefore(times, canvas.range.to);
-  context.font = '500 11px "Inter", system-ui, -apple-system, "Segoe UI", Roboto, "Liberation Sans", sans-serif';
+  context.font = `500 11px ${palette.font}`;
   context.textBaseline = 'middle';
   for (let i = Math.max(0, countUntil(times, canvas.range.from) - 1); i < end; ) {
     const { start, end: stop, text, colour } = band(i);
@@ -166,6 +170,7 @@ export function drawBands(canvas: LaneCanvas, times: Float64Array, band: (index:
 
 function drawBandText({ context, top, height }: LaneCanvas, text: string, left: number, right: number, colour: string): void {
   const shown = shortened(context, text, right - left);
+  if (shown !== text && shown.length < 5) return; // says nothing
   context.fillStyle = colour;
   context.fillText(shown, left, top + height / 2 + 0.5);
 }

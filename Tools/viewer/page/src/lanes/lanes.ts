@@ -38,22 +38,26 @@ function filled(session: Session, kind: string): Track | undefined {
   return track && track.count > 0 ? track : undefined;
 }
 
-/// The same name always has the same colour.
-function colourOf(name: string, { bands }: Palette): string {
-  let hash = 7;
-  for (const character of name) hash = (Math.imul(hash, 31) + character.codePointAt(0)!) >>> 0;
-  return bands[hash % bands.length]!;
+/// Each name has a colour of its own, as long as there are enough.
+class NameColours {
+  private readonly places = new Map<string, number>();
+
+  of(name: string, { bands }: Palette): string {
+    if (!this.places.has(name)) this.places.set(name, this.places.size);
+    return bands[this.places.get(name)! % bands.length]!;
+  }
 }
 
 function textLane(session: Session, kind: string, column: string, title: string): Lane | undefined {
   const track = filled(session, kind);
+  const colours = new NameColours();
   return track && {
     title,
-    height: 26,
+    height: 23,
     draw: (canvas) =>
       drawBands(canvas, track.times, (index) => {
         const text = track.text(column, index);
-        const colour = colourOf(appAt(session, track.times[index]!) || text, canvas.palette);
+        const colour = colours.of(appAt(session, track.times[index]!) || text, canvas.palette);
         return { start: track.times[index]!, end: track.endOf(index, session.duration), text, colour };
       }),
     valueAt: (time) => textAt(track, column, time),
@@ -98,9 +102,10 @@ function rectText(track: Track, time: number): string {
 function windowLane(session: Session): Lane | undefined {
   const track = filled(session, 'topmostWindow');
   if (!track || filled(session, 'topmostAppName') || filled(session, 'topmostWindowTitle')) return undefined;
+  const colours = new NameColours();
   return {
     title: 'Window',
-    height: 26,
+    height: 23,
     draw: (canvas) =>
       drawBands(canvas, track.times, (index) => {
         const text = rectText(track, track.times[index]!);
@@ -108,22 +113,26 @@ function windowLane(session: Session): Lane | undefined {
           start: track.times[index]!,
           end: track.endOf(index, session.duration),
           text,
-          colour: colourOf(text, canvas.palette),
+          colour: colours.of(text, canvas.palette),
         };
       }),
     valueAt: (time) => rectText(track, time),
   };
 }
 
+const roomForClicks = 6; // pixels to a click, from which on each is drawn
+
 function clickLane({ clicks }: Session): Lane | undefined {
   if (clicks.length === 0) return undefined;
   const starts = Float64Array.from(clicks, ({ start }) => start);
   return {
     title: 'Clicks',
-    height: 24,
+    height: 20,
     draw: (canvas) => {
       const end = countBefore(starts, canvas.range.to);
-      for (let i = Math.max(0, countUntil(starts, canvas.range.from) - 4); i < end; ) {
+      const first = countUntil(starts, canvas.range.from);
+      if (end - first > canvas.width / roomForClicks) return drawDensity(canvas, starts, canvas.palette.accent);
+      for (let i = Math.max(0, first - 4); i < end; ) {
         drawClick(canvas, clicks[i]!);
         i = Math.max(i + 1, countBefore(starts, canvas.time(canvas.x(starts[i]!) + 1.5)));
       }
@@ -151,13 +160,13 @@ function drawClick(canvas: LaneCanvas, click: Click): void {
   context.fill();
 }
 
-const roomForKeys = 15; // pixels to a key, from which on each shows what it is
+const roomForKeys = 12; // pixels to a key, from which on each shows what it is
 
 function keyLane(session: Session, { showsKeys }: LaneOptions): Lane | undefined {
   const track = filled(session, 'keyboardAction');
   return track && {
     title: 'Keys',
-    height: 26,
+    height: 23,
     draw: (canvas) => {
       const first = countBefore(track.times, canvas.range.from);
       const end = countBefore(track.times, canvas.range.to);
@@ -173,13 +182,13 @@ function keyLane(session: Session, { showsKeys }: LaneOptions): Lane | undefined
 
 function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number, showsKeys: boolean): void {
   const { context, palette: { accent, accentSoft, text } } = canvas;
-  context.font = '600 11px "Inter", system-ui, -apple-system, "Segoe UI", Roboto, "Liberation Sans", sans-serif';
+  context.font = `600 11px ${canvas.palette.font}`;
   context.textBaseline = 'middle';
   for (let i = first; i < end; ++i) {
     const x = canvas.x(track.times[i]!);
     const room = (i + 1 < end ? canvas.x(track.times[i + 1]!) : Infinity) - x;
     const label = keyLabel(track, i, showsKeys).text.replace(/\[(.*)\]$/, '$1').trim() || '␣';
-    const width = Math.max(13, context.measureText(label).width + 8);
+    const width = Math.max(9, context.measureText(label).width + 6);
     context.fillStyle = accent;
     context.fillRect(x - 0.75, canvas.top + 4, 1.5, canvas.height - 8);
     if (width > room - 1) continue;
@@ -188,7 +197,7 @@ function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number, 
     context.roundRect(x, canvas.top + 4, width, canvas.height - 8, [0, 3, 3, 0]);
     context.fill();
     context.fillStyle = text;
-    context.fillText(label, x + 4, canvas.top + canvas.height / 2 + 0.5);
+    context.fillText(label, x + 3, canvas.top + canvas.height / 2 + 0.5);
   }
 }
 
@@ -215,7 +224,7 @@ function scrollLane(session: Session): Lane | undefined {
   const most = Math.max(usualGreatest(distances.map(Math.abs)), 1);
   return {
     title: 'Scroll',
-    height: 30,
+    height: 24,
     draw: (canvas) => drawScroll(canvas, track.times, extremes, most),
     valueAt: (time) => {
       const index = track.at(time);
@@ -266,7 +275,7 @@ function speedLane(session: Session): Lane | undefined {
   const curve = curveOf(track, values.map(Math.sqrt), 0, Math.sqrt(usualGreatest(values)));
   return {
     title: 'Cursor speed',
-    height: 36,
+    height: 30,
     draw: (canvas) => drawArea(canvas, curve, canvas.palette.accent, 0.28),
     valueAt: (time) => {
       const index = track.at(time);
@@ -287,7 +296,7 @@ function trailLane(session: Session): Lane | undefined {
   const y = curveOf(track, valuesOf(track, (i) => -track.number('y', i)), -(region.y + region.height), -region.y);
   return {
     title: 'Cursor x, y',
-    height: 40,
+    height: 32,
     draw: (canvas) => {
       drawLine(canvas, x, canvas.palette.accent);
       drawLine(canvas, y, canvas.palette.second);
@@ -316,13 +325,13 @@ function hoverLane(session: Session): Lane | undefined {
   const times = Float64Array.from(starts);
   return {
     title: 'Hover',
-    height: 22,
+    height: 18,
     draw: (canvas) =>
       drawBands(canvas, times, (index) => ({
         start: times[index]!,
         end: times[index + 1] ?? session.duration,
         text: texts[index]!,
-        colour: canvas.palette.bands[index % 2 ? 5 : 4]!,
+        colour: index % 2 ? canvas.palette.line : canvas.palette.grid,
       })),
     valueAt: (time) => texts[lastAt(times, time)] ?? '',
   };
@@ -334,7 +343,7 @@ function opacityLane(session: Session): Lane | undefined {
   const curve = curveOf(track, valuesOf(track, (i) => track.number('opacity', i)), 0, 1);
   return {
     title: 'Opacity',
-    height: 26,
+    height: 20,
     draw: (canvas) => drawArea(canvas, curve, canvas.palette.third, 0.16),
     valueAt: (time) => `${Math.round(opacityAt(session, time) * 100)} %`,
   };
@@ -349,7 +358,7 @@ function cpuLane(session: Session): Lane | undefined {
   const curve = curveOf(track, values, 0, high);
   return {
     title: 'CPU usage',
-    height: 36,
+    height: 28,
     draw: (canvas) => drawArea(canvas, curve, canvas.palette.second, 0.22),
     valueAt: (time) => {
       const index = track.at(time);

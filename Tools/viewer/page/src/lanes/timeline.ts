@@ -210,7 +210,7 @@ export class Timeline {
     context.clearRect(0, 0, width, rulerHeight);
     const canvas = new LaneCanvas(context, palette(), this.range, width, 0, rulerHeight);
     const step = tickStep(this.range, width, 84);
-    context.font = '11px "Inter", system-ui, -apple-system, "Segoe UI", Roboto, "Liberation Sans", sans-serif';
+    context.font = `11px ${palette().font}`;
     context.textBaseline = 'middle';
     for (const time of ticks(this.range, step / 5)) {
       context.fillStyle = palette().line;

@@ -52,13 +52,14 @@ export function screenToVideo(point: Point, placement: Placement): Point {
 
 export function rectToVideo(rect: Rect, placement: Placement): Rect {
   const scale = pixelsPerUnit(placement);
-  return { ...screenToVideo(rect, placement), width: rect.width * scale.x, height: rect.height * scale.y };
+  const corner = screenToVideo(rect, placement);
+  return { x: corner.x, y: corner.y, width: rect.width * scale.x, height: rect.height * scale.y };
 }
 
 /// Where an image of the cursor goes, so that its hot spot lies on `location`. An image's pixel is a unit of the screen.
 export function cursorImageRect(location: Point, hotSpot: Point, image: Size, placement: Placement): Rect {
-  const corner = { x: location.x - hotSpot.x, y: location.y - hotSpot.y };
-  return rectToVideo({ ...corner, ...image }, placement);
+  const { width, height } = image;
+  return rectToVideo({ x: location.x - hotSpot.x, y: location.y - hotSpot.y, width, height }, placement);
 }
 
 /// The largest rectangle with the shape of `frame` in the middle of `room`.

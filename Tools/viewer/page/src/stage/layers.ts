@@ -44,6 +44,7 @@ export interface Scene {
   images: CursorImages;
   clickStarts: Float64Array;
   accent: string;
+  font: string;
   isStill: boolean;
 }
 
@@ -95,10 +96,8 @@ function outline(context: Context, { accent, unit }: Scene, rect: Rect, width: n
   context.setLineDash([]);
 }
 
-const font = '"Inter", system-ui, -apple-system, "Segoe UI", Roboto, "Liberation Sans", sans-serif';
-
 /// A name on the upper edge of a rectangle, kept inside the picture.
-function tag(context: Context, { unit, accent, placement }: Scene, rect: Rect, text: string): void {
+function tag(context: Context, { unit, accent, font, placement }: Scene, rect: Rect, text: string): void {
   if (!text) return;
   const size = 11 * unit;
   context.font = `600 ${size}px ${font}`;
@@ -214,7 +213,7 @@ function ring(context: Context, centre: Point, radius: number, width: number, co
   context.globalAlpha = 1;
 }
 
-function chip(context: Context, { unit, placement }: Scene, text: string, centre: Point): void {
+function chip(context: Context, { unit, font, placement }: Scene, text: string, centre: Point): void {
   context.font = `600 ${11 * unit}px ${font}`;
   context.textBaseline = 'middle';
   const width = context.measureText(text).width + 12 * unit;

@@ -6,6 +6,7 @@ import { captionAt, type Caption } from '../model/keys';
 import { lastAt } from '../model/search';
 import type { Session } from '../model/session';
 import { byId, fitCanvas, make } from '../ui/dom';
+import { palette } from '../ui/palette';
 import { CursorImages } from './cursors';
 import {
   drawClicks,
@@ -90,7 +91,8 @@ export class Stage {
       unit: frame.width / this.width,
       images: this.images,
       clickStarts: this.clickStarts,
-      accent: '#4f8cff',
+      accent: '#3d7bff',
+      font: palette().font,
       isStill: reducedMotion.matches,
     };
     this.drawLayers(context, scene);

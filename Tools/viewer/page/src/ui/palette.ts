@@ -14,6 +14,7 @@ export interface Palette {
   idle: string;
   bands: string[];
   bandText: string;
+  font: string;
 }
 
 let current: Palette | undefined;
@@ -36,6 +37,7 @@ export function palette(): Palette {
     idle: colour('idle'),
     bands: [1, 2, 3, 4, 5, 6].map((number) => colour(`band-${number}`)),
     bandText: colour('band-text'),
+    font: colour('font'),
   });
 }
 
