@@ -54,7 +54,7 @@ export default defineConfig({
   base: './',
   publicDir: false,
   resolve: { alias: { '#decoder': decoder } },
-  worker: { format: 'es' },
+  worker: { format: 'iife' }, // pages that are opened from a folder may not start modules as workers
   build: {
     target: 'es2022',
     assetsInlineLimit: Number.MAX_SAFE_INTEGER,
