@@ -1,11 +1,12 @@
 #!/usr/bin/env bash
-# Records a simulated session of 20 seconds, puts it into a movie, reads it back and checks that it is the same.
+# Records a simulated session of 20 seconds, puts it into a movie, reads it back and checks that it is the same, and
+# writes a page that shows it.
 # Usage: scripts/demo.sh [FOLDER]; everything is left in FOLDER (demo-output where none is named).
 set -euo pipefail
 cd "$(dirname "$0")/.."
 folder=${1:-demo-output}
 
-scripts/install.sh build media
+scripts/install.sh build media viewer
 
 echo "== building"
 cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF >/dev/null
@@ -30,5 +31,9 @@ ffprobe -v error -show_entries stream=codec_name,duration -of compact=nokey=1:pr
 echo "== what zulm shows of it"
 build/release/Tools/zulm/zulm info "$movie"
 
+echo "== writing a page that shows it playing"
+build/release/Tools/zulm/zulm view "$movie" -o "$folder/Recording.html" --force
+
 echo
 echo "The movie is $movie, its stream files are in $folder/streams."
+echo "Open the page in a browser: $folder/Recording.html"

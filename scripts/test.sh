@@ -8,6 +8,7 @@ preset=${1:-dev}
 
 scripts/install.sh build media test
 case "$preset" in
+    dev | release) scripts/install.sh viewer browser ;; # the other presets leave the viewer out
     clang) scripts/install.sh check ;;
     libcxx | arm64) scripts/install.sh "$preset" ;;
 esac
