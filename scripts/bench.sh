@@ -17,7 +17,7 @@ done
 
 scripts/install.sh build media bench
 echo "== building" >&2
-cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF >/dev/null
+cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF -DZULM_BUILD_VIEWER=OFF >/dev/null
 cmake --build --preset release --target zulm benchmarks >&2
 
 table=$(mktemp)

@@ -50,7 +50,7 @@ for library in libpng libtiff libre2; do stub $library; done
 for processor in aarch64 x86_64; do
     echo "== building for macOS on $processor"
     cmake -S . -B "build/macos/$processor" -G Ninja --toolchain cmake/macos/toolchain.cmake \
-        -DCMAKE_PROJECT_TOP_LEVEL_INCLUDES=cmake/macos/dependencies.cmake -DCMAKE_BUILD_TYPE=Debug \
+        -DCMAKE_PROJECT_TOP_LEVEL_INCLUDES=cmake/macos/dependencies.cmake -DCMAKE_BUILD_TYPE=Debug -DZULM_BUILD_VIEWER=OFF \
         -DZULM_MACOS_PROCESSOR=$processor -DZULM_ZIG="$zig" -DZULM_MACOS_DEPENDENCIES="$dependencies" \
         -DZULMETADATA_BUILD_TESTS=OFF -DCMAKE_INSTALL_LIBDIR=lib -DZULMETADATA_BUILD_EXAMPLES=ON >/dev/null
     cmake --build "build/macos/$processor" -j2 --target zulm record_and_read

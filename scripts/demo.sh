@@ -9,7 +9,7 @@ folder=${1:-demo-output}
 scripts/install.sh build media viewer
 
 echo "== building"
-cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF >/dev/null
+cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF -DZULM_BUILD_VIEWER=ON >/dev/null
 cmake --build --preset release --target zulm
 
 echo "== making a movie of 20 seconds"

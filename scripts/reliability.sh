@@ -7,9 +7,9 @@ cd "$(dirname "$0")/.."
 
 scripts/install.sh build media test check reliability
 echo "== building" >&2
-cmake --preset release -DZULMETADATA_BUILD_TESTS=ON >/dev/null
+cmake --preset release -DZULMETADATA_BUILD_TESTS=ON -DZULM_BUILD_VIEWER=OFF >/dev/null
 cmake --build --preset release --target zulm reliability_programs >&2
-cmake --preset dev >/dev/null # for valgrind
+cmake --preset dev -DZULM_BUILD_VIEWER=OFF >/dev/null # for valgrind
 cmake --build --preset dev >&2
 
 python3 Tests/Reliability/run.py --build build/release "$@"

@@ -6,15 +6,16 @@ set -euo pipefail
 cd "$(dirname "$0")/.."
 preset=${1:-dev}
 
+viewer=()
 scripts/install.sh build media test
 case "$preset" in
-    dev | release) scripts/install.sh viewer browser ;; # the other presets leave the viewer out
+    dev | release) scripts/install.sh viewer browser && viewer=(-DZULM_BUILD_VIEWER=ON) ;; # others leave it out
     clang) scripts/install.sh check ;;
     libcxx | arm64) scripts/install.sh "$preset" ;;
 esac
 
 echo "== building ($preset)"
-cmake --preset "$preset" >/dev/null
+cmake --preset "$preset" "${viewer[@]}" >/dev/null
 cmake --build --preset "$preset"
 
 echo "== testing ($preset)"
