@@ -35,6 +35,8 @@ export class App {
   private movieName = '';
   private isFramePending = false;
   private opened = 0;
+  /// How many files were opened or refused.
+  finished = 0;
   private controls!: Controls;
   private readonly timeline: Timeline;
   private readonly entries: EntriesPane;
@@ -58,6 +60,8 @@ export class App {
   }
 
   start(): void {
+    mark('zulm:start');
+    if (document.getElementById('zulm-recording')) this.decoder.prepare();
     placeIcons();
     setUpTabs(() => this.requestFrame());
     setUpSplitters();
@@ -108,6 +112,8 @@ export class App {
     try {
       const { decoded, problems } = await this.decoder.open(source, name);
       if (opening !== this.opened) return;
+      mark('zulm:decoded');
+      if (decoded.streams.length === 0) throw new Error('it holds nothing that was recorded beside a movie');
       byId('notice').hidden = true;
       this.show(new Session(complete(decoded)));
       if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
@@ -115,6 +121,7 @@ export class App {
       if (opening === this.opened) this.complain(`${name} cannot be shown: ${wordsOf(error)}.`);
     } finally {
       if (opening === this.opened) document.body.classList.remove('is-busy');
+      ++this.finished;
     }
   }
 
@@ -133,12 +140,19 @@ export class App {
     this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration);
     this.stage.show(session);
     this.timeline.show(session, this.player.duration);
-    showFacts(session, this.player.duration);
-    showCheck(session);
-    this.entries.show(session);
     this.followLink();
     this.frame();
     mark('zulm:first-picture');
+    setTimeout(() => this.showDetails(session));
+  }
+
+  /// What may come after the first picture.
+  private showDetails(session: Session): void {
+    if (session !== this.session) return;
+    this.entries.show(session);
+    showFacts(session, this.player.duration);
+    showCheck(session);
+    this.requestFrame();
     void this.stage.images.prepare(session.appearances);
     announce(`${session.name} is open`);
   }

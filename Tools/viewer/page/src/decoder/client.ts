@@ -13,9 +13,14 @@ export class Decoder {
   private lastId = 0;
   private readonly waiting = new Map<number, { done: (reply: Reply) => void; failed: (error: Error) => void }>();
 
-  /// A file is read in slices, as far as needed; a text is the file itself in base64.
+  /// So that it is there when it is needed.
+  prepare(): void {
+    this.running();
+  }
+
+  /// A file is read in slices, as far as needed; a text is the file itself in base64, whose reports are known.
   async open(source: Blob | string, name: string): Promise<{ decoded: Decoded; problems: string[] }> {
-    const reply = await this.ask({ type: 'open', source, name });
+    const reply = await this.ask({ type: 'open', source, name, reports: typeof source !== 'string' });
     if (reply.type !== 'opened') throw new DecoderError('the decoder answered something else');
     return reply;
   }

@@ -3,7 +3,7 @@
 import type { Decoded } from '../model/session';
 
 export type Request =
-  | { id: number; type: 'open'; source: Blob | string; name: string }
+  | { id: number; type: 'open'; source: Blob | string; name: string; reports: boolean }
   | { id: number; type: 'dump'; kinds?: string[] };
 
 export type Reply =

@@ -19,7 +19,7 @@ function bytesOf(base64: string): Uint8Array {
   return bytes;
 }
 
-function decode(opened: Recording, name: string): { decoded: Decoded; problems: string[] } {
+function decode(opened: Recording, name: string, reports: boolean): { decoded: Decoded; problems: string[] } {
   const problems: string[] = [];
   const attempt = <Result>(what: string, action: () => Result): Result | undefined => {
     try {
@@ -40,8 +40,8 @@ function decode(opened: Recording, name: string): { decoded: Decoded; problems: 
     duration: opened.duration,
     streams: opened.streams.map((stream) => ({ ...stream })),
     entries,
-    info: attempt('facts', () => opened.info()) ?? {},
-    verify: attempt('check', () => opened.verify()) ?? {},
+    info: (reports && attempt('facts', () => opened.info())) || {},
+    verify: (reports && attempt('check', () => opened.verify())) || {},
   };
   return { decoded, problems };
 }
@@ -61,11 +61,11 @@ async function answer(request: Request): Promise<[Reply, ArrayBuffer[]]> {
     if (!recording) throw new ZulmError('nothing is open');
     return [{ id, type: 'dumped', text: recording.dump(request.kinds) }, []];
   }
-  const { source, name } = request;
+  const { source, name, reports } = request;
   recording?.close();
   recording = undefined;
   recording = await Recording.open(typeof source === 'string' ? bytesOf(source) : source, name);
-  const { decoded, problems } = decode(recording, name);
+  const { decoded, problems } = decode(recording, name, reports);
   return [{ id, type: 'opened', decoded, problems }, transferable(decoded)];
 }
 

@@ -9,15 +9,13 @@ const rowLines = 24; // pixels of a row where text has its usual size
 const tallest = 16_000_000; // pixels: browsers do not lay out much more
 
 export class Table {
-  readonly element = make('div', { class: 'table' });
   onActivate: (row: number) => void = () => {};
   private rows: Rows | undefined;
   /// The rows to show; null is all of them.
   private chosen: Uint32Array | null = null;
   private readonly head = make('div', { class: 'table-head', role: 'row', 'aria-rowindex': 1 });
-  private readonly scroller = make('div', { class: 'table-body', role: 'rowgroup' });
-  private readonly space = make('div', { class: 'table-space', role: 'presentation' });
-  private readonly grid = make('div', { class: 'table-grid', role: 'grid', tabindex: 0, 'aria-label': 'Entries' });
+  private readonly space = make('div', { class: 'table-space', role: 'rowgroup' });
+  private readonly scroller = make('div', { class: 'table', role: 'grid', tabindex: 0, 'aria-label': 'Entries' });
   private pool: HTMLElement[] = [];
   private rowHeight = rowLines;
   private current = -1;
@@ -26,11 +24,9 @@ export class Table {
   private anchor = -1;
 
   constructor() {
-    this.scroller.append(this.space);
-    this.grid.append(this.head, this.scroller);
-    this.element.append(this.grid);
+    this.scroller.append(make('div', { role: 'rowgroup', class: 'table-top' }, this.head), this.space);
     this.scroller.addEventListener('scroll', () => this.draw());
-    this.grid.addEventListener('keydown', (event) => this.press(event));
+    this.scroller.addEventListener('keydown', (event) => this.press(event));
     this.space.addEventListener('click', (event) => this.click(event));
     new ResizeObserver(() => this.resize()).observe(this.scroller);
   }
@@ -40,8 +36,8 @@ export class Table {
     const widths = rows.columns.map(({ name, isNumber }, i) =>
       i === 0 ? '4.75rem' : name === 'kind' ? '8rem' : isNumber ? 'minmax(3.5rem, 1fr)' : 'minmax(7rem, 2fr)',
     );
-    this.element.style.setProperty('--columns', widths.join(' '));
-    this.element.style.setProperty('--least', `${rows.columns.reduce((sum, { isNumber }, i) => sum + (i === 0 ? 5.5 : isNumber ? 4.25 : 7.75), 1.5)}rem`);
+    this.scroller.style.setProperty('--columns', widths.join(' '));
+    this.scroller.style.setProperty('--least', `${rows.columns.reduce((sum, { isNumber }, i) => sum + (i === 0 ? 5.5 : isNumber ? 4.25 : 7.75), 1.5)}rem`);
     this.head.replaceChildren(
       ...rows.columns.map(({ title, isNumber }) =>
         make('div', { role: 'columnheader', class: isNumber ? 'is-number' : undefined, title }, title),
@@ -49,7 +45,7 @@ export class Table {
     );
     for (const element of this.pool) element.remove();
     this.pool = [];
-    this.grid.setAttribute('aria-colcount', String(rows.columns.length));
+    this.scroller.setAttribute('aria-colcount', String(rows.columns.length));
     this.scroller.scrollTop = 0;
     this.resize();
   }
@@ -93,6 +89,15 @@ export class Table {
     this.draw();
   }
 
+  get element(): HTMLElement {
+    return this.scroller;
+  }
+
+  /// Below the head, which stays.
+  private get room(): number {
+    return this.scroller.clientHeight - this.head.offsetHeight;
+  }
+
   private rowAt(place: number): number {
     return this.chosen ? this.chosen[place]! : place;
   }
@@ -106,21 +111,20 @@ export class Table {
   private resize(): void {
     this.rowHeight = rowLines * uiScale();
     this.space.style.height = `${Math.min(tallest, this.shownCount * this.rowHeight)}px`;
-    this.grid.setAttribute('aria-rowcount', String(this.shownCount + 1));
+    this.scroller.setAttribute('aria-rowcount', String(this.shownCount + 1));
     this.refresh();
   }
 
   /// Rows to a pixel of scrolling.
   private get density(): number {
-    const room = this.scroller.clientHeight;
+    const { room } = this;
     const whole = this.shownCount * this.rowHeight;
     return whole <= tallest ? 1 : (whole - room) / (tallest - room);
   }
 
   private reveal(place: number): void {
-    const { scroller, density } = this;
+    const { scroller, density, room } = this;
     const top = scroller.scrollTop * density;
-    const room = scroller.clientHeight;
     const y = place * this.rowHeight;
     if (room <= 0 || (y >= top && y + this.rowHeight <= top + room)) return;
     const isNear = y > top - room && y < top + 2 * room;
@@ -130,10 +134,10 @@ export class Table {
 
   private draw(): void {
     const { rows, scroller } = this;
-    if (!rows || scroller.clientHeight === 0) return;
+    if (!rows || this.room <= 0) return;
     const top = scroller.scrollTop * this.density;
     const first = Math.max(0, Math.floor(top / this.rowHeight) - 4);
-    const end = Math.min(this.shownCount, first + Math.ceil(scroller.clientHeight / this.rowHeight) + 9);
+    const end = Math.min(this.shownCount, first + Math.ceil(this.room / this.rowHeight) + 9);
     while (this.pool.length < end - first) this.pool.push(this.newRow(rows.columns));
     this.pool.forEach((element, i) => {
       const place = first + i;
@@ -158,7 +162,7 @@ export class Table {
     const isSelected = this.selected >= 0 && place >= low && place <= high;
     element.classList.toggle('is-selected', isSelected);
     element.setAttribute('aria-selected', String(isSelected));
-    if (place === this.selected) this.grid.setAttribute('aria-activedescendant', (element.id = 'row-selected'));
+    if (place === this.selected) this.scroller.setAttribute('aria-activedescendant', (element.id = 'row-selected'));
     else element.removeAttribute('id');
     if (element.dataset.row === String(row)) return;
     element.dataset.row = String(row);
@@ -177,7 +181,7 @@ export class Table {
   }
 
   private press(event: KeyboardEvent): void {
-    const page = Math.max(1, Math.floor(this.scroller.clientHeight / this.rowHeight) - 1);
+    const page = Math.max(1, Math.floor(this.room / this.rowHeight) - 1);
     const last = this.shownCount - 1;
     const from = this.selected >= 0 ? this.selected : Math.max(0, this.current);
     const places: Record<string, number> = {

@@ -86,7 +86,7 @@ function streamTable({ streams }: Session): HTMLElement {
     make('tr', {},
       make('th', { scope: 'row', title: uuid }, titleOf(kind)),
       ...[known ? count(entries) : 'unknown', time(first), time(last), count(size)].map((text) => make('td', {}, text))));
-  return make('div', { class: 'table-scroll' }, make('table', {}, make('thead', {}, head), make('tbody', {}, ...rows)));
+  return make('div', { class: 'table-scroll', tabindex: 0, role: 'group', 'aria-label': 'Streams' }, make('table', {}, make('thead', {}, head), make('tbody', {}, ...rows)));
 }
 
 function allFindings({ verify }: Session): Finding[] {

@@ -254,24 +254,10 @@ function drawScroll(canvas: LaneCanvas, times: Float64Array, extremes: Extremes,
   }
 }
 
-/// In units of the screen to a second.
-export function speeds(track: Track): Float32Array {
-  const result = new Float32Array(track.count);
-  for (let i = 1; i < track.count; ++i) {
-    const passed = track.times[i]! - track.times[i - 1]!;
-    const way = Math.hypot(
-      track.number('x', i) - track.number('x', i - 1),
-      track.number('y', i) - track.number('y', i - 1),
-    );
-    if (passed > 0 && Number.isFinite(way)) result[i] = way / passed;
-  }
-  return result;
-}
-
 function speedLane(session: Session): Lane | undefined {
   const track = filled(session, 'cursorLocation');
   if (!track) return undefined;
-  const values = speeds(track);
+  const values = session.speeds;
   const curve = curveOf(track, values.map(Math.sqrt), 0, Math.sqrt(usualGreatest(values)));
   return {
     title: 'Cursor speed',

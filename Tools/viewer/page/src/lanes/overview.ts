@@ -8,7 +8,6 @@ import { clampedRange, type Range } from './axis';
 import { Extremes } from './extremes';
 import { dragging } from './gestures';
 import { drawArea, LaneCanvas, type Curve } from './lane';
-import { speeds } from './lanes';
 
 const height = 34;
 const grip = 7; // pixels beside an edge that still hold it
@@ -34,8 +33,8 @@ export class Overview {
   show(session: Session, duration: number): void {
     if (session !== this.session) {
       const track = session.track('cursorLocation');
-      const values = track && speeds(track).map(Math.sqrt);
-      this.curve = values && { times: track.times, extremes: new Extremes(values), low: 0, high: 70 };
+      const values = session.speeds.map(Math.sqrt);
+      this.curve = track && { times: track.times, extremes: new Extremes(values), low: 0, high: 70 };
     }
     [this.session, this.duration, this.isStale] = [session, duration, true];
   }

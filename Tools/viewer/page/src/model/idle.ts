@@ -11,21 +11,24 @@ export interface Stretch {
 const shortest = 3; // seconds
 
 /// When the cursor was somewhere else than before.
-function* moves(track: Track | undefined): Generator<number> {
+function moves(track: Track | undefined): Float64Array {
   const [x, y] = [track?.column('x'), track?.column('y')];
-  if (!track || !x || !y) return;
+  if (!track || !x || !y) return new Float64Array();
+  const times = new Float64Array(track.count);
+  let used = 0;
   for (let i = 0; i < track.count; ++i) {
     const row = track.row(i);
     const before = i > 0 ? track.row(i - 1) : row;
-    if (i === 0 || x[row] !== x[before] || y[row] !== y[before]) yield track.times[i]!;
+    if (i === 0 || x[row] !== x[before] || y[row] !== y[before]) times[used++] = track.times[i]!;
   }
+  return times.subarray(0, used);
 }
 
 export function idleStretches(session: Pick<Session, 'track' | 'duration'>): Stretch[] {
   const kinds = ['cursorAction', 'keyboardAction', 'scrollAction'];
   const lists = kinds.map((kind) => session.track(kind)?.times ?? new Float64Array());
   if (!session.track('cursorLocation') && lists.every(({ length }) => length === 0)) return [];
-  const moved = Float64Array.from(moves(session.track('cursorLocation')));
+  const moved = moves(session.track('cursorLocation'));
   const active = new Float64Array([...lists, moved].reduce((sum, { length }) => sum + length, 0));
   let used = 0;
   for (const list of [...lists, moved]) {

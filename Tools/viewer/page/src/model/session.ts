@@ -7,6 +7,7 @@ import { hasArea, type Rect } from './geometry';
 import { idleStretches, type Stretch } from './idle';
 import { captionsOf, type Caption } from './keys';
 import { markersOf } from './markers';
+import { speeds } from './speed';
 import { Track } from './track';
 
 export interface Finding {
@@ -60,6 +61,8 @@ export class Session {
   readonly clicks: Click[];
   readonly markers: Float64Array;
   readonly idle: Stretch[];
+  /// Of the cursor, for each of its positions.
+  readonly speeds: Float32Array;
   private readonly tracks = new Map<string, Track>();
   private readonly captionLists = new Map<boolean, { captions: Caption[]; starts: Float64Array }>();
 
@@ -77,6 +80,7 @@ export class Session {
     this.clicks = clicksOf(this.track('cursorAction'), this.duration);
     this.markers = markersOf(this);
     this.idle = idleStretches(this);
+    this.speeds = speeds(this.track('cursorLocation'));
   }
 
   track(kind: string): Track | undefined {

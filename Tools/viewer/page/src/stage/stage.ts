@@ -7,6 +7,7 @@ import { lastAt } from '../model/search';
 import type { Session } from '../model/session';
 import { byId, fitCanvas, make } from '../ui/dom';
 import { palette } from '../ui/palette';
+import { uiScale } from '../ui/scale';
 import { CursorImages } from './cursors';
 import {
   drawClicks,
@@ -88,7 +89,7 @@ export class Stage {
       session,
       placement: this.placement,
       time,
-      unit: frame.width / this.width,
+      unit: (frame.width / this.width) * uiScale(),
       images: this.images,
       clickStarts: this.clickStarts,
       accent: '#3d7bff',

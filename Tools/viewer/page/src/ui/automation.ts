@@ -6,6 +6,8 @@ import { cursorPosition, opacityAt } from '../stage/layers';
 
 export interface ViewerState {
   isOpen: boolean;
+  /// Files that were opened or refused so far.
+  finished: number;
   time: number;
   duration: number;
   playing: boolean;
@@ -25,10 +27,11 @@ declare global {
   };
 }
 
-function stateOf({ session, player, stage }: App): ViewerState {
+function stateOf({ session, player, stage, finished }: App): ViewerState {
   const position = session && cursorPosition(session, player.time);
   return {
     isOpen: session !== undefined,
+    finished,
     time: player.time,
     duration: player.duration,
     playing: player.playing,

@@ -1,0 +1,268 @@
+// The page of the demo's movie: what it draws is what was recorded.
+
+import assert from 'node:assert/strict';
+import { readFileSync, writeFileSync } from 'node:fs';
+import { join } from 'node:path';
+import { test } from 'node:test';
+import { folder, emptyPage, open, opened, ready, recordedSession, seek, state, textOf, zulm } from './support.mjs';
+
+const recording = recordedSession();
+const dump = zulm('dump', '--format', 'json', 'Recording.mp4');
+const streams = new Map(JSON.parse(dump).files[0].streams.map(({ kind, entries }) => [kind, entries]));
+
+const times = [0.5, 1.55, 2.9, 4.25, 5.6, 8.05, 10.4, 13.1, 14.45, 18.7];
+
+function lastBefore(kind, time) {
+  return streams.get(kind).filter(({ timestamp }) => timestamp <= time).at(-1);
+}
+
+/// Those of the stream, in its order.
+function storedImages() {
+  const bytes = readFileSync(join(folder, 'streams/cursorImage.dat'));
+  const [start, end] = [Buffer.from('\x89PNG\r\n', 'latin1'), Buffer.from('IEND', 'latin1')];
+  const images = [];
+  for (let at = bytes.indexOf(start); at >= 0; at = bytes.indexOf(start, at + 1))
+    images.push(bytes.subarray(at, bytes.indexOf(end, at) + 8));
+  return images;
+}
+
+/// The image that the cursor has at a time, and its hot spot.
+function cursorAt(time) {
+  const images = storedImages();
+  const shown = lastBefore('cursorImage', time);
+  const withImages = streams.get('cursorImage').filter(({ image }) => image !== null);
+  const index = withImages.findLastIndex(({ id, timestamp }) => id === shown.id && timestamp <= time);
+  const { hotspotOffsetX: x, hotspotOffsetY: y } = withImages[index];
+  return { image: images[index].toString('base64'), hotSpot: { x, y } };
+}
+
+/// What an image holds around a place, and what the page drew around another one, each with its alpha multiplied in.
+function patches(page, image, hotSpot, drawn, opacity, reach) {
+  return page.evaluate(
+    async ({ image, hotSpot, drawn, opacity, reach }) => {
+      const bytes = Uint8Array.from(atob(image), (character) => character.charCodeAt(0));
+      const bitmap = await createImageBitmap(new Blob([bytes]));
+      const canvas = new OffscreenCanvas(bitmap.width, bitmap.height);
+      canvas.getContext('2d').drawImage(bitmap, 0, 0);
+      const side = 2 * reach + 1;
+      const patch = (context, x, y, opacity) => {
+        const { data } = context.getImageData(x - reach, y - reach, side, side);
+        return Array.from(data, (value, i) => Math.round((i % 4 === 3 ? value : (value * data[i - (i % 4) + 3]) / 255) * opacity));
+      };
+      const overlay = document.getElementById('overlay').getContext('2d');
+      return {
+        recorded: patch(canvas.getContext('2d'), hotSpot.x, hotSpot.y, opacity),
+        shown: patch(overlay, drawn.x, drawn.y, 1),
+      };
+    },
+    { image, hotSpot, drawn, opacity, reach },
+  );
+}
+
+/// Gives the stage the movie's own size, so that a pixel of it is one of the screen.
+async function showAtFullSize(page) {
+  await page.evaluate(() => document.documentElement.style.setProperty('--side-width', '300px'));
+  const stage = await page.locator('#stage').boundingBox();
+  const { width, height } = page.viewportSize();
+  await page.setViewportSize({ width: width + 1280 - stage.width, height: height + 720 - stage.height });
+  await page.waitForFunction(() => document.getElementById('overlay').width === 1280);
+}
+
+test('the cursor has its hot spot where it was recorded', async () => {
+  const { page, problems, close } = await open(recording.page, { size: [1700, 1300] });
+  await opened(page);
+  await ready(page);
+  assert.equal((await state(page)).movie, 'ready');
+  await showAtFullSize(page);
+  for (const layer of ['2', '3', '4', '5']) await page.keyboard.press(layer); // nothing but the cursor
+  await page.waitForTimeout(300);
+  let compared = 0;
+  for (const time of times) {
+    await seek(page, time);
+    const { x, y } = lastBefore('cursorLocation', time);
+    const drawn = { x: x - 160, y: y - 90 };
+    assert.deepEqual((await state(page)).hotSpot, drawn, `at ${time}`);
+    const { image, hotSpot } = cursorAt(time);
+    const { opacity } = lastBefore('cursorOpacity', time);
+    const { recorded, shown } = await patches(page, image, hotSpot, drawn, opacity, 3);
+    assert.ok(recorded.some((value) => value > 60), `the cursor can be seen at ${time}`);
+    recorded.forEach((value, i) => assert.ok(Math.abs(value - shown[i]) <= 3, `at ${time}: ${recorded} is ${shown}`));
+    ++compared;
+  }
+  assert.equal(compared, 10);
+  assert.deepEqual(problems, []);
+  await close();
+});
+
+/// Of a subtitle file.
+function cues(text) {
+  const seconds = (clock) => clock.split(/[:,]/).reduce((sum, part, i) => sum + Number(part) * [3600, 60, 1, 0.001][i], 0);
+  return text
+    .trim()
+    .split('\n\n')
+    .map((cue) => cue.split('\n'))
+    .map(([, span, ...lines]) => ({ times: span.split(' --> ').map(seconds), text: lines.join('\n').replaceAll('\u2060', '') }));
+}
+
+test('captions are those of the tool, masked until the reader asks', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  const compare = async (...options) => {
+    const all = cues(zulm('convert', '--to', 'srt', ...options, 'Recording.mp4'));
+    for (const { times: [, end], text } of all) {
+      await seek(page, end - 0.005); // when all its keys have been pressed
+      assert.equal((await state(page)).caption, text, `at ${end}`);
+      assert.equal(await page.locator('#caption').getAttribute('data-text'), text);
+    }
+    return all.map(({ text }) => text).join();
+  };
+  const masked = await compare();
+  assert.ok(!masked.includes('HALLO') && masked.includes('•'));
+  assert.ok(!(await page.content()).includes('HALLO'));
+  await page.keyboard.press('k');
+  assert.ok((await compare('--show-keys')).includes('HALLO'));
+  await seek(page, 2.3);
+  assert.equal((await state(page)).caption, 'HA');
+  await close();
+});
+
+test('a dropped movie is decoded to what the tool prints', async () => {
+  const empty = join(folder, 'empty.html');
+  writeFileSync(empty, emptyPage(readFileSync(recording.page, 'utf8')));
+  const { page, problems, close } = await open(empty);
+  assert.ok(await page.locator('#welcome-open').isVisible());
+  const bytes = readFileSync(recording.movie).toString('base64');
+  await page.evaluate((base64) => {
+    const data = new DataTransfer();
+    const bytes = Uint8Array.from(atob(base64), (character) => character.charCodeAt(0));
+    data.items.add(new File([bytes], 'Recording.mp4', { type: 'video/mp4' }));
+    for (const type of ['dragenter', 'dragover', 'drop'])
+      document.body.dispatchEvent(new DragEvent(type, { dataTransfer: data, bubbles: true, cancelable: true }));
+  }, bytes);
+  await opened(page);
+  await ready(page);
+  assert.equal((await state(page)).movie, 'ready');
+  assert.equal(await page.evaluate(() => zulmViewer.dump()), dump);
+  assert.deepEqual(problems, []);
+  await close();
+});
+
+test('nothing leaves the page', async () => {
+  const { page, requests, problems, close } = await open(recording.page);
+  await opened(page);
+  await ready(page);
+  await page.keyboard.press('Space');
+  await page.waitForTimeout(800);
+  await page.keyboard.press('Space');
+  for (const url of requests) assert.match(url, /^(file|blob|data):/);
+  assert.deepEqual([...new Set(requests.filter((url) => url.startsWith('file:')).map((url) => url.split('/').at(-1)))], ['Recording.html', 'Recording.mp4']);
+  assert.deepEqual(problems, []);
+  const refused = await page.evaluate(() => fetch('https://example.com/').then(() => false, () => true));
+  assert.ok(refused && problems.some((text) => text.includes('Content Security Policy')), problems.join());
+  await close();
+});
+
+test('playing goes on in time, with the movie', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  await ready(page);
+  await page.keyboard.press('Space');
+  await page.waitForFunction(() => zulmViewer.state().time > 0.7);
+  assert.ok((await state(page)).playing);
+  await page.keyboard.press('Space');
+  const { time } = await state(page);
+  const movie = await page.evaluate(() => document.getElementById('movie').currentTime);
+  assert.ok(Math.abs(movie - time) < 0.1, `${movie} and ${time}`);
+  await close();
+});
+
+test('keys go to frames, markers and the ends', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  const timeAfter = async (key) => {
+    await page.keyboard.press(key);
+    return (await state(page)).time;
+  };
+  assert.equal(await timeAfter(']'), 1.5);
+  assert.equal(await timeAfter(']'), 4.2);
+  assert.equal(await timeAfter('['), 1.5);
+  assert.equal(await timeAfter('ArrowRight'), 2.5);
+  assert.equal(await timeAfter('ArrowLeft'), 1.5);
+  assert.ok(Math.abs((await timeAfter('.')) - 1.5 - 1 / 30) < 1e-9);
+  assert.ok(Math.abs((await timeAfter(',')) - 1.5) < 1e-9);
+  assert.equal(await timeAfter('Home'), 0);
+  assert.ok((await timeAfter('End')) >= 19.9);
+  await page.keyboard.press('?');
+  assert.ok(await page.locator('#help-dialog').isVisible());
+  await page.keyboard.press('Escape');
+  assert.ok(!(await page.locator('#help-dialog').isVisible()));
+  await close();
+});
+
+test('a link tells the time, in both directions', async () => {
+  const { page, close } = await open(recording.page, { hash: '#t=12.5' });
+  await opened(page);
+  assert.equal((await state(page)).time, 12.5);
+  await seek(page, 3.25);
+  await page.waitForFunction(() => location.hash === '#t=3.25');
+  await page.evaluate(() => (location.hash = '#t=7'));
+  await page.waitForFunction(() => zulmViewer.state().time === 7);
+  await close();
+});
+
+test('entries are filtered, lead to their time and are copied masked', async () => {
+  const { page, close } = await open(recording.page);
+  await page.context().grantPermissions(['clipboard-read', 'clipboard-write']);
+  await opened(page);
+  await page.getByLabel('Stream').selectOption('cursorAction');
+  await page.getByLabel('Filter entries').fill('action=right');
+  assert.match(await textOf(page, '.entries-status'), /^2 of 13$/);
+  await page.getByLabel('Next match').click();
+  assert.equal((await state(page)).time, 8);
+  await page.getByLabel('Next match').click();
+  assert.equal((await state(page)).time, 8.15);
+  await page.getByLabel('Previous match').click();
+  assert.equal((await state(page)).time, 8);
+  const clipboard = () => page.evaluate(() => navigator.clipboard.readText());
+  await page.getByLabel('Copy as JSON').click();
+  await page.waitForFunction(() => document.querySelector('.entries-status').textContent.includes('copied'));
+  assert.deepEqual(JSON.parse(await clipboard()), [
+    { action: 'right down', rawActionValue: 4, timestamp: 8 },
+    { action: 'right up', rawActionValue: 8, timestamp: 8.15 },
+  ]);
+  await page.getByLabel('Filter entries').fill('');
+  await page.getByLabel('Stream').selectOption('keyboardAction');
+  await page.getByLabel('Copy as CSV').click();
+  await page.waitForFunction(() => document.querySelector('.entries-status').textContent.includes('copied as CSV'));
+  const copied = (await clipboard()).split('\n').slice(1, -1);
+  assert.equal(copied.length, 12);
+  for (const line of copied) assert.match(line, /^•,•,/);
+  await page.locator('.table-row', { hasText: '0:05.500' }).click();
+  assert.equal((await state(page)).time, 5.5);
+  await close();
+});
+
+test('the movie may be missing: the recorded region stands for it', async () => {
+  const lonely = join(folder, 'lonely');
+  zulm('view', 'Recording.mp4', '-o', 'lonely.html');
+  const text = readFileSync(join(folder, 'lonely.html'), 'utf8').replace('"movie":"Recording.mp4"', '"movie":"Missing.mp4"');
+  writeFileSync(`${lonely}.html`, text);
+  const { page, close } = await open(`${lonely}.html`);
+  await opened(page);
+  await page.waitForFunction(() => zulmViewer.state().movie === 'failed');
+  assert.match(await textOf(page, '#stage-note'), /^Missing\.mp4 is not beside this page/);
+  await page.keyboard.press('Space');
+  await page.waitForFunction(() => zulmViewer.state().time > 0.5);
+  assert.deepEqual((await state(page)).frame, { width: 1280, height: 720 });
+  await close();
+});
+
+test('an embedded movie needs no other file', async () => {
+  zulm('view', 'Recording.mp4', '-o', 'Embedded.html', '--embed');
+  const { page, requests, close } = await open(join(folder, 'Embedded.html'));
+  await opened(page);
+  await ready(page);
+  assert.equal((await state(page)).movie, 'ready');
+  assert.equal(requests.filter((url) => url.startsWith('file:')).length, 1);
+  await close();
+});

@@ -1,0 +1,115 @@
+// A browser with the viewer's page in it, and the recordings that it is tested with.
+//
+// ZULM_PATH names the tool, ZULM_TEST_MODULES the folder in which the packages are installed, ZULM_LONG_RECORDING the
+// program that records an hour, ZULM_TEST_DATA the damaged files. CHROMIUM may name the browser.
+
+import assert from 'node:assert/strict';
+import { execFileSync, spawnSync } from 'node:child_process';
+import { mkdtempSync, rmSync } from 'node:fs';
+import { createRequire } from 'node:module';
+import { tmpdir } from 'node:os';
+import { join } from 'node:path';
+import { after } from 'node:test';
+import { fileURLToPath, pathToFileURL } from 'node:url';
+
+export function setting(name) {
+  const value = process.env[name];
+  if (!value) throw new Error(`${name} is not set`);
+  return value;
+}
+
+const require = createRequire(join(setting('ZULM_TEST_MODULES'), 'package.json'));
+const { chromium } = require('playwright-core');
+export const axeSource = require('axe-core').source;
+
+const sources = fileURLToPath(new URL('../../..', import.meta.url));
+
+export const folder = mkdtempSync(join(tmpdir(), 'zulm-viewer-'));
+after(() => rmSync(folder, { recursive: true, force: true }));
+
+/// What the tool prints; it works in the folder of the recordings.
+export function zulm(...parameters) {
+  const { stdout, stderr, status } = spawnSync(setting('ZULM_PATH'), parameters, {
+    cwd: folder,
+    encoding: 'utf8',
+    maxBuffer: 1 << 28,
+  });
+  assert.equal(status, 0, `zulm ${parameters.join(' ')}: ${stderr}`);
+  return stdout;
+}
+
+/// The demo's recording over a movie of its windows, with its page beside it.
+export function recordedSession() {
+  const plain = join(folder, 'plain.mp4');
+  execFileSync(join(sources, 'scripts/desktop-movie.sh'), [plain], { stdio: ['ignore', 'ignore', 'inherit'] });
+  zulm('demo', '.', '--movie', plain, '--force');
+  zulm('view', 'Recording.mp4', '-o', 'Recording.html');
+  return { movie: join(folder, 'Recording.mp4'), page: join(folder, 'Recording.html') };
+}
+
+/// An hour of metadata, with a movie of a picture a second.
+export function longRecording() {
+  const movie = join(folder, 'Hour.mp4');
+  const picture = ['-f', 'lavfi', '-i', 'color=c=0x202633:s=640x360:r=1', '-t', '3600', '-g', '30'];
+  const parameters = ['-v', 'error', '-y', ...picture, '-c:v', 'libx264', '-preset', 'ultrafast', '-pix_fmt', 'yuv420p', movie];
+  execFileSync('ffmpeg', parameters, { stdio: ['ignore', 'ignore', 'inherit'] });
+  execFileSync(setting('ZULM_LONG_RECORDING'), [movie, join(folder, 'hour')]);
+  zulm('view', 'Hour.mp4', '-o', 'Hour.html');
+  return { movie, page: join(folder, 'Hour.html') };
+}
+
+/// The page that `zulm view` wrote, without its recording.
+export function emptyPage(text) {
+  return text.replace(/<script type="application\/json" id="zulm-recording">[^<]*<\/script>\n?/, '');
+}
+
+let browser;
+after(() => browser?.close());
+
+/// A page that keeps what went wrong in it and what it asked for.
+export async function open(path, { size = [1280, 800], theme = 'dark', hash = '', ...more } = {}) {
+  browser ??= await chromium.launch({
+    executablePath: process.env.CHROMIUM ?? '/usr/bin/chromium',
+    args: ['--no-sandbox', '--disable-gpu', '--force-color-profile=srgb', '--hide-scrollbars'],
+  });
+  const [width, height] = size;
+  const context = await browser.newContext({ viewport: { width, height }, colorScheme: theme, ...more });
+  const page = await context.newPage();
+  const problems = [];
+  const requests = [];
+  page.on('pageerror', (error) => problems.push(String(error)));
+  page.on('console', (message) => message.type() === 'error' && problems.push(message.text()));
+  page.on('request', (request) => requests.push(request.url()));
+  await page.goto(pathToFileURL(path).href + hash);
+  return { page, problems, requests, close: () => context.close() };
+}
+
+export async function opened(page) {
+  await page.waitForFunction(() => globalThis.zulmViewer?.state().isOpen, null, { timeout: 60_000 });
+}
+
+/// Until the movie shows the picture at that time, or there is no movie.
+export async function ready(page) {
+  await page.waitForFunction(() => !['loading'].includes(zulmViewer.state().movie), null, { timeout: 60_000 });
+}
+
+export function state(page) {
+  return page.evaluate(() => zulmViewer.state());
+}
+
+/// Goes there and lets the page draw.
+export async function seek(page, time) {
+  await page.evaluate(
+    (time) =>
+      new Promise((done) => {
+        zulmViewer.seek(time);
+        requestAnimationFrame(() => requestAnimationFrame(done));
+      }),
+    time,
+  );
+}
+
+/// The visible words of an element.
+export function textOf(page, selector) {
+  return page.locator(selector).innerText();
+}

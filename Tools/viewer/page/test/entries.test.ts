@@ -1,0 +1,88 @@
+import assert from 'node:assert/strict';
+import { test } from 'node:test';
+import { asCSV, asJSON } from '../src/entries/copy';
+import { filterRows, testOf } from '../src/entries/filter';
+import { AllRows, StreamRows, type Rows } from '../src/entries/rows';
+import { Track } from '../src/model/track';
+
+const keys = new Track({
+  kind: 'keyboardAction',
+  time: Float64Array.of(2, 2.5),
+  columns: {
+    characterCode: Int32Array.of(72, 73),
+    characterString: ['H', 'I'],
+    eventFlagsCode: Int32Array.of(0, 0),
+    eventFlagsString: ['NONE', '<Shift>, "so"'],
+  },
+});
+
+const points = new Track({
+  kind: 'cursorLocation',
+  time: Float64Array.of(1, 2, 3, Number.NaN),
+  columns: { x: Int32Array.of(100, 200, 900, 4), y: Int32Array.of(5, 6, 7, 8) },
+});
+
+async function found(rows: Rows, query: string): Promise<number[]> {
+  let result: number[] = [];
+  await filterRows(rows, testOf(query)!, () => false, (matches, isDone) => isDone && (result = [...matches]));
+  return result;
+}
+
+test('all streams come by time, entries without a time come never', () => {
+  const rows = new AllRows([keys, points], () => true);
+  assert.equal(rows.count, 5);
+  assert.deepEqual([0, 1, 2, 3, 4].map((row) => [rows.time(row), rows.cell(row, 1)]), [
+    [1, 'Cursor location'],
+    [2, 'Keyboard action'],
+    [2, 'Cursor location'],
+    [2.5, 'Keyboard action'],
+    [3, 'Cursor location'],
+  ]);
+  assert.equal(rows.rowAt(2.2), 2);
+});
+
+test('one stream comes as it is stored', () => {
+  const rows = new StreamRows(points, () => true);
+  assert.equal(rows.count, 4);
+  assert.deepEqual(rows.columns.map(({ title }) => title), ['Time', 'X', 'Y']);
+  assert.deepEqual([rows.cell(2, 0), rows.cell(2, 1), rows.cell(3, 0)], ['0:03.000', '900', 'NaN']);
+});
+
+test('words and comparisons find rows', async () => {
+  const rows = new StreamRows(points, () => true);
+  assert.deepEqual(await found(rows, 'x>150'), [1, 2]);
+  assert.deepEqual(await found(rows, 'x>=200 y!=7'), [1]);
+  assert.deepEqual(await found(rows, 'time<2.5'), [0, 1]);
+  assert.deepEqual(await found(rows, '900'), [2]);
+  assert.deepEqual(await found(rows, 'nothing'), []);
+  assert.equal(testOf('   '), null);
+  assert.deepEqual(await found(new AllRows([keys, points], () => true), 'kind=keyboard shift'), [3]);
+});
+
+test('what was typed is neither shown nor found nor copied before the reader asks', async () => {
+  let shows = false;
+  const rows = new StreamRows(keys, () => shows);
+  assert.equal(rows.cell(0, 2), '•');
+  assert.deepEqual(await found(rows, 'characterString=H'), []);
+  assert.deepEqual(await found(rows, 'characterCode=72'), []);
+  assert.ok(!asJSON(rows, [0]).includes('72') && !asCSV(rows, [0]).includes('H'));
+  assert.ok(!new AllRows([keys], () => shows).cell(0, 2).includes('72'));
+  shows = true;
+  assert.equal(rows.cell(0, 2), 'H');
+  assert.deepEqual(await found(rows, 'characterString=H'), [0]);
+});
+
+test('rows are copied as JSON and CSV', () => {
+  const rows = new StreamRows(keys, () => true);
+  assert.deepEqual(JSON.parse(asJSON(rows, [1])), [
+    { characterCode: 73, characterString: 'I', eventFlagsCode: 0, eventFlagsString: '<Shift>, "so"', timestamp: 2.5 },
+  ]);
+  assert.equal(asCSV(rows, [1]), 'characterCode,characterString,eventFlagsCode,eventFlagsString,timestamp\n73,I,0,"<Shift>, ""so""",2.5\n');
+});
+
+test('copies of several streams have the columns of all', () => {
+  const rows = new AllRows([keys, points], () => true);
+  const lines = asCSV(rows, [0, 1]).split('\n');
+  assert.equal(lines[0], 'kind,x,y,timestamp,characterCode,characterString,eventFlagsCode,eventFlagsString');
+  assert.equal(lines[1], 'cursorLocation,100,5,1,,,,');
+});

@@ -1,0 +1,59 @@
+import assert from 'node:assert/strict';
+import { test } from 'node:test';
+import { clampedRange, tickDigits, ticks, tickStep, zoomed } from '../src/lanes/axis';
+import { Extremes } from '../src/lanes/extremes';
+import { speeds } from '../src/model/speed';
+import { Track } from '../src/model/track';
+import { randomNumbers, syntheticEntries } from './synthetic';
+
+test('the extremes of any run are those of its values', () => {
+  const random = randomNumbers(3);
+  const values = Float32Array.from({ length: 137 }, () => random() * 200 - 100);
+  const extremes = new Extremes(values);
+  for (let first = 0; first < values.length; first += 5)
+    for (let end = first + 1; end <= values.length; end += 7) {
+      const run = values.slice(first, end);
+      assert.deepEqual(extremes.of(first, end), [Math.min(...run), Math.max(...run)]);
+    }
+  assert.deepEqual(extremes.of(4, 4), [Infinity, -Infinity]);
+});
+
+test('marks on the axis have round numbers and room', () => {
+  assert.equal(tickStep({ from: 0, to: 20 }, 1000, 84), 2);
+  assert.equal(tickStep({ from: 0, to: 3600 }, 1000, 84), 600);
+  assert.equal(tickStep({ from: 0, to: 90000 }, 1000, 84), 10800);
+  assert.deepEqual(ticks({ from: 1.5, to: 6 }, 2), [2, 4, 6]);
+  assert.deepEqual([tickDigits(2), tickDigits(0.5), tickDigits(0.02), tickDigits(0.001)], [0, 1, 2, 3]);
+});
+
+test('a range stays inside the recording', () => {
+  assert.deepEqual(clampedRange({ from: -5, to: 5 }, 20), { from: 0, to: 10 });
+  assert.deepEqual(clampedRange({ from: 15, to: 25 }, 20), { from: 10, to: 20 });
+  assert.deepEqual(clampedRange({ from: -5, to: 50 }, 20), { from: 0, to: 20 });
+});
+
+test('zooming keeps the time below the pointer where it is', () => {
+  const { from, to } = zoomed({ from: 0, to: 20 }, 5, 0.5, 20);
+  assert.deepEqual([from, to], [2.5, 12.5]);
+  const near = zoomed({ from: 4, to: 4.06 }, 4.03, 0.01, 20);
+  assert.ok(Math.abs(near.to - near.from - 0.05) < 1e-9);
+  assert.deepEqual(zoomed({ from: 5, to: 15 }, 10, 100, 20), { from: 0, to: 20 });
+});
+
+test('speed is the way from the position before', () => {
+  const track = new Track({
+    kind: 'cursorLocation',
+    time: Float64Array.of(0, 0.5, 0.5, 1),
+    columns: { x: Int32Array.of(0, 30, 60, 60), y: Int32Array.of(0, 40, 80, 80) },
+  });
+  assert.deepEqual([...speeds(track)], [0, 100, 0, 0]);
+});
+
+test('the synthetic hour has what a real one has', () => {
+  const entries = new Map(syntheticEntries(3600).map((stream) => [stream.kind, stream]));
+  assert.equal(entries.get('cursorLocation')!.time.length, 216000);
+  assert.ok(entries.get('keyboardAction')!.time.length > 15000);
+  const images = entries.get('cursorImage')!.columns.image as (Uint8Array | null)[];
+  assert.equal(images.filter(Boolean).length, 200);
+  assert.equal(entries.size, 17);
+});

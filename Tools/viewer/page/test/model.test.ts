@@ -1,0 +1,143 @@
+import assert from 'node:assert/strict';
+import { test } from 'node:test';
+import type { Column, Entries } from '#decoder';
+import { cursorAppearances } from '../src/model/appearances';
+import { clickLabel, clicksAround, clicksOf } from '../src/model/clicks';
+import { bytes, clock, plural, spokenTime, titleOf } from '../src/model/format';
+import { heatHeight, heatOf, heatWidth } from '../src/model/heat';
+import { placementOf } from '../src/model/geometry';
+import { linkTo, timeInLink } from '../src/model/link';
+import { markerAfter, markerBefore } from '../src/model/markers';
+import { countBefore, countUntil, lastAt } from '../src/model/search';
+import { Session, type Decoded } from '../src/model/session';
+import { Track } from '../src/model/track';
+
+export function entries(kind: string, time: number[], columns: Record<string, Column> = {}): Entries {
+  return { kind, time: Float64Array.from(time), columns };
+}
+
+function session(...list: Entries[]): Session {
+  const decoded: Decoded = {
+    name: 'Test.mp4',
+    container: 'movie',
+    duration: 20,
+    streams: [],
+    entries: list,
+    info: {},
+    verify: {},
+  };
+  return new Session(decoded);
+}
+
+test('searching counts what lies before a time', () => {
+  const times = [1, 2, 2, 3];
+  assert.equal(countBefore(times, 2), 1);
+  assert.equal(countUntil(times, 2), 3);
+  assert.equal(lastAt(times, 0.5), -1);
+  assert.equal(lastAt(times, 9), 3);
+  assert.equal(countBefore([], 1), 0);
+});
+
+test('a track brings its entries into the order of their times, and leaves out those without', () => {
+  const track = new Track(entries('scrollAction', [3, Number.NaN, 1, 2, Infinity], { y: Int32Array.of(30, 0, 10, 20, 0) }));
+  assert.deepEqual([...track.times], [1, 2, 3]);
+  assert.deepEqual([0, 1, 2].map((i) => track.number('y', i)), [10, 20, 30]);
+  assert.equal(track.row(0), 2);
+  assert.equal(track.at(2.5), 1);
+});
+
+test('an entry without an image shows the one that came with its number before', () => {
+  const [arrow, hand] = [Uint8Array.of(1), Uint8Array.of(2)];
+  const track = new Track(
+    entries('cursorImage', [0, 1, 2, 3, 4], {
+      id: BigInt64Array.of(9n, 7n, 8n, 7n, 8n),
+      image: [null, arrow, hand, null, null],
+      hotspotOffsetX: Int32Array.of(0, 5, 6, 0, 0),
+      hotspotOffsetY: Int32Array.of(0, 3, 4, 0, 0),
+    }),
+  );
+  const shown = cursorAppearances(track);
+  assert.deepEqual(shown.map(({ image }) => image.length && image[0]), [0, 1, 2, 1, 2]);
+  assert.deepEqual(shown[3]!.hotSpot, { x: 5, y: 3 });
+});
+
+test('a button is held until it comes up', () => {
+  const track = new Track(
+    entries('cursorAction', [0, 1, 2, 2.5, 3, 4], {
+      action: ['mouse init', 'left down + shift + cmd', 'right down', 'left up', 'right up', 'middle down'],
+    }),
+  );
+  const clicks = clicksOf(track, 20);
+  assert.deepEqual(clicks.map(({ button, start, end }) => [button, start, end]), [['left', 1, 2.5], ['right', 2, 3], ['middle', 4, 5]]);
+  assert.equal(clickLabel(clicks[0]!), '⇧⌘ left');
+  const starts = Float64Array.from(clicks, ({ start }) => start);
+  assert.deepEqual(clicksAround(clicks, starts, 2.2, 0.6).map(({ button }) => button), ['right', 'left']);
+  assert.deepEqual(clicksAround(clicks, starts, 3.5, 0.2), []);
+});
+
+test('markers are clicks, windows and slides', () => {
+  const { markers } = session(
+    entries('cursorAction', [5], { action: ['left down'] }),
+    entries('topmostAppName', [0, 7], { name: ['Editor', 'Terminal'] }),
+    entries('topmostWindowTitle', [0, 7.01], { title: ['a', 'b'] }),
+    entries('slideTitles', [9], { title: ['One'] }),
+  );
+  assert.deepEqual([...markers], [0, 5, 7, 9]);
+  assert.equal(markerAfter(markers, 5), 7);
+  assert.equal(markerBefore(markers, 5), 0);
+  assert.equal(markerAfter(markers, 9), undefined);
+});
+
+test('the person is idle where nothing moves for three seconds', () => {
+  const still = (length: number) => new Int32Array(length).fill(4);
+  const { idle } = session(
+    entries('cursorLocation', [0, 1, 2, 3, 4, 5, 6, 7, 8], { x: Int32Array.of(1, 2, 2, 2, 2, 2, 3, 3, 3), y: still(9) }),
+    entries('keyboardAction', [8, 18.5]),
+  );
+  assert.deepEqual(idle, [{ start: 1, end: 6 }, { start: 8, end: 18.5 }]);
+});
+
+test('a recording without any input is not idle: nothing is known', () => {
+  assert.deepEqual(session(entries('cpuUsage', [0])).idle, []);
+});
+
+test('the last region with an area is the recorded one, and the length covers every entry', () => {
+  const recording = session(
+    entries('recordingRegion', [0, 1], { x: Int32Array.of(1, 9), y: Int32Array.of(2, 9), width: Int32Array.of(3, 0), height: Int32Array.of(4, 9) }),
+    entries('cpuUsage', [0, 25.5]),
+  );
+  assert.deepEqual(recording.region, { x: 1, y: 2, width: 3, height: 4 });
+  assert.equal(recording.duration, 25.5);
+});
+
+test('the place where the cursor stayed longest is the warmest', () => {
+  const track = new Track(entries('cursorLocation', [0, 1, 4], { x: Int32Array.of(320, 960, 100), y: Int32Array.of(270, 810, 100) }));
+  const placement = placementOf({ x: 0, y: 0, width: 1280, height: 1080 }, 1, undefined);
+  const heat = heatOf(track, placement, 0, 4);
+  const at = (x: number, y: number) => heat[Math.floor(y * heatHeight) * heatWidth + Math.floor(x * heatWidth)]!;
+  assert.equal(at(0.75, 0.75), 1);
+  assert.ok(at(0.25, 0.25) > 0.4 && at(0.25, 0.25) < 0.7);
+  assert.equal(at(0.5, 0.1), 0);
+});
+
+test('links tell a time', () => {
+  assert.equal(timeInLink('#t=12.5'), 12.5);
+  assert.equal(timeInLink('#x=1&t=3'), 3);
+  assert.equal(timeInLink('#t=abc'), undefined);
+  assert.equal(timeInLink(''), undefined);
+  assert.equal(linkTo(12.5000001), '#t=12.5');
+});
+
+test('numbers and times in words', () => {
+  assert.equal(clock(3725.5), '1:02:05.500');
+  assert.equal(clock(59.9999), '1:00.000');
+  assert.equal(clock(61, 0), '1:01');
+  assert.equal(clock(-1.25, 2), '−0:01.25');
+  assert.equal(spokenTime(3661.5), '1 hour 1 minute 1.5 seconds');
+  assert.equal(spokenTime(0), '0 seconds');
+  assert.equal(bytes(1), '1 byte');
+  assert.equal(bytes(1536), '1.50 KiB');
+  assert.equal(plural(1234, 'entry', 'entries'), '1,234 entries');
+  assert.equal(titleOf('topmostAppName'), 'Topmost app name');
+  assert.equal(titleOf('cpuUsage'), 'CPU usage');
+});
