@@ -37,7 +37,7 @@ test('pictures', async () => {
     await seek(page, 14.45);
   });
   await take('zoomed', { theme: 'light' }, async (page) => {
-    await page.getByLabel('Stream').selectOption('cursorAction');
+    await page.getByLabel('Stream', { exact: true }).selectOption('cursorAction');
     await page.keyboard.press('6');
     await seek(page, 8.1);
     for (let i = 0; i < 2; ++i) await page.keyboard.press('+');

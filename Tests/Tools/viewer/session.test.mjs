@@ -199,6 +199,45 @@ test('keys go to frames, markers and the ends', async () => {
   await close();
 });
 
+test('lanes are zoomed, moved and lead to their time', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  const lanes = await page.locator('.lanes-body').boundingBox();
+  const range = () => textOf(page, '.zoom-text');
+  const clickAt = async (part) => {
+    await page.mouse.click(lanes.x + lanes.width * part, lanes.y + 40);
+    return (await state(page)).time;
+  };
+  assert.equal(await range(), 'all');
+  assert.ok(Math.abs((await clickAt(0.25)) - 5) < 0.05);
+  await page.mouse.wheel(0, -1000); // at the pointer
+  await page.waitForFunction(() => document.querySelector('.zoom-text').textContent !== 'all');
+  assert.ok(Math.abs((await clickAt(0.25)) - 5) < 0.05);
+  const before = await clickAt(0.5);
+  await page.mouse.move(lanes.x + lanes.width * 0.5, lanes.y + 40);
+  await page.mouse.down();
+  await page.mouse.move(lanes.x + lanes.width * 0.3, lanes.y + 40, { steps: 4 });
+  await page.mouse.up();
+  assert.equal((await state(page)).time, before); // moved the lanes, not the time
+  assert.ok(Math.abs((await clickAt(0.3)) - before) < 0.05);
+  await page.keyboard.press('0');
+  assert.equal(await range(), 'all');
+  await page.keyboard.press('End');
+  await page.keyboard.press('+');
+  assert.ok((await clickAt(0.98)) > 19.5); // stays where the playhead is
+  await close();
+});
+
+test('everything is saved as the tool prints it, once the reader agrees', async () => {
+  const { page, close } = await open(recording.page, { acceptDownloads: true });
+  await opened(page);
+  await page.getByLabel('Save all entries as a JSON file').click();
+  const [download] = await Promise.all([page.waitForEvent('download'), page.getByRole('button', { name: 'Save', exact: true }).click()]);
+  assert.equal(download.suggestedFilename(), 'Recording.mp4.json');
+  assert.deepEqual(JSON.parse(readFileSync(await download.path(), 'utf8')).files[0].streams, JSON.parse(dump).files[0].streams);
+  await close();
+});
+
 test('a link tells the time, in both directions', async () => {
   const { page, close } = await open(recording.page, { hash: '#t=12.5' });
   await opened(page);
@@ -214,7 +253,7 @@ test('entries are filtered, lead to their time and are copied masked', async () 
   const { page, close } = await open(recording.page);
   await page.context().grantPermissions(['clipboard-read', 'clipboard-write']);
   await opened(page);
-  await page.getByLabel('Stream').selectOption('cursorAction');
+  await page.getByLabel('Stream', { exact: true }).selectOption('cursorAction');
   await page.getByLabel('Filter entries').fill('action=right');
   assert.match(await textOf(page, '.entries-status'), /^2 of 13$/);
   await page.getByLabel('Next match').click();
@@ -231,7 +270,7 @@ test('entries are filtered, lead to their time and are copied masked', async () 
     { action: 'right up', rawActionValue: 8, timestamp: 8.15 },
   ]);
   await page.getByLabel('Filter entries').fill('');
-  await page.getByLabel('Stream').selectOption('keyboardAction');
+  await page.getByLabel('Stream', { exact: true }).selectOption('keyboardAction');
   await page.getByLabel('Copy as CSV').click();
   await page.waitForFunction(() => document.querySelector('.entries-status').textContent.includes('copied as CSV'));
   const copied = (await clipboard()).split('\n').slice(1, -1);

@@ -24,8 +24,6 @@ import { setUpSplitters } from './ui/splitter';
 import { setUpTabs, showTab } from './ui/tabs';
 import { setUpTheme } from './ui/theme';
 
-const frameLength = 1 / 30; // seconds, where the movie does not tell
-
 export class App {
   readonly player = new Player(byId<HTMLVideoElement>('movie'));
   readonly stage = new Stage(this.player);
@@ -170,7 +168,7 @@ export class App {
 
   stepFrame(direction: 1 | -1): void {
     this.player.pause();
-    this.step(direction * frameLength);
+    this.step(direction * this.player.frameLength);
   }
 
   stepMarker(direction: 1 | -1): void {
@@ -246,7 +244,13 @@ export class App {
     const note = byId('stage-note');
     const { movie } = this.player;
     note.hidden = !this.session || movie === 'ready' || movie === 'loading';
-    const reason = movie === 'failed' ? `${this.movieName || 'The movie'} is not beside this page, or has no pictures that this browser can show.` : 'There is no movie with this recording.';
+    const name = this.movieName || 'The movie';
+    const reason =
+      movie === 'none'
+        ? 'There is no movie with this recording.'
+        : this.movieUrl.startsWith('blob:')
+          ? `This browser can show no pictures of ${name}.`
+          : `${name} is not beside this page, or has no pictures that this browser can show.`;
     setText(note, `${reason} The recorded region stands for it.`);
   }
 

@@ -54,7 +54,7 @@ function activityFacts(session: Session): Fact[] {
     ['Clicks', count(session.clicks.length)],
     ['Keys', count(keys)],
     ['Cursor images', count(images)],
-    ['Idle', `${clock(idle, 0)} in ${plural(session.idle.length, 'stretch', 'stretches')}`],
+    ['Idle', idle > 0 ? `${clock(idle, 0)} in ${plural(session.idle.length, 'stretch', 'stretches')}` : 'never'],
   ];
 }
 

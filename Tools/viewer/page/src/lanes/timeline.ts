@@ -28,6 +28,7 @@ export class Timeline {
   private values: HTMLElement[] = [];
   private isStale = true;
   private shownTime = -1;
+  private time = 0;
   private readonly overview: Overview;
   private readonly labels = make('div', { class: 'lane-labels' });
   private readonly lanesCanvas = make('canvas', { class: 'lanes-canvas', 'aria-hidden': 'true' });
@@ -124,7 +125,7 @@ export class Timeline {
   /// Around the playhead where that is in sight.
   zoom(factor: number): void {
     const { from, to } = this.range;
-    const anchor = this.shownTime >= from && this.shownTime <= to ? this.shownTime : (from + to) / 2;
+    const anchor = this.time >= from && this.time <= to ? this.time : (from + to) / 2;
     this.setRange(zoomed(this.range, anchor, factor, this.duration));
   }
 
@@ -137,6 +138,7 @@ export class Timeline {
 
   invalidate(): void {
     this.isStale = true;
+    this.shownTime = -1;
     this.overview.invalidate();
     this.events.onRange(this.range);
   }
@@ -146,6 +148,7 @@ export class Timeline {
     if (!this.session) return;
     if (this.isStale) this.drawLanes();
     this.overview.draw(this.range, time);
+    this.time = time;
     if (time === this.shownTime) return;
     this.shownTime = time;
     const x = this.xOf(time);

@@ -2,6 +2,8 @@
 
 export type MovieState = 'none' | 'loading' | 'ready' | 'failed';
 
+const usualFrame = 1 / 30; // seconds, until the movie has shown shorter ones
+
 export class Player {
   playing = false;
   movie: MovieState = 'none';
@@ -12,8 +14,11 @@ export class Player {
   private lastTick = 0;
   private length = 0;
   private speed = 1;
+  private shortestFrame = usualFrame;
+  private lastPicture = NaN;
 
   constructor(readonly video: HTMLVideoElement) {
+    this.watchFrames();
     video.addEventListener('loadedmetadata', () => this.movieLoaded());
     video.addEventListener('error', () => this.movieFailed());
     video.addEventListener('seeked', () => this.seeked());
@@ -21,10 +26,16 @@ export class Player {
     video.addEventListener('loadeddata', () => this.onChange());
   }
 
+  /// Seconds from one picture of the movie to the next, as far as it has been seen.
+  get frameLength(): number {
+    return this.shortestFrame;
+  }
+
   /// `duration` is what the metadata lasts; a longer movie makes it more.
   load(url: string | null, duration: number): void {
     this.pause();
     [this.position, this.wanted, this.length] = [0, undefined, duration];
+    [this.shortestFrame, this.lastPicture] = [usualFrame, NaN];
     this.movie = url === null ? 'none' : 'loading';
     if (url === null) this.video.removeAttribute('src');
     else this.video.src = url;
@@ -97,6 +108,15 @@ export class Player {
     if (this.position < this.duration) return;
     this.position = this.duration;
     this.pause();
+  }
+
+  private watchFrames(): void {
+    this.video.requestVideoFrameCallback?.((_, { mediaTime }) => {
+      const passed = Math.abs(mediaTime - this.lastPicture);
+      if (passed > 1 / 250 && passed < this.shortestFrame) this.shortestFrame = passed;
+      this.lastPicture = mediaTime;
+      this.watchFrames();
+    });
   }
 
   private movieLength(): number {
