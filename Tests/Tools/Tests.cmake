@@ -37,4 +37,5 @@ target_compile_definitions(Tools.SchemaTest PRIVATE
   ZULM_DOCS="${PROJECT_SOURCE_DIR}/Docs" ZULM_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/Data")
 zulm_add_tool_test(Tools/ToolRunTest)
 zulm_add_tool_test(Tools/ViewCommandTest)
+target_compile_definitions(Tools.ViewCommandTest PRIVATE ZULM_HAS_PAGE=$<BOOL:${ZULM_VIEWER}>)
 include(Tools/VerifyTests.cmake)

@@ -75,6 +75,20 @@ TEST_F(ViewCommand, PutsWhatIsKnownOfARecordingIntoThePage) {
     EXPECT_EQ(recording.at("verify"), reportOf("verify", movie()));
 }
 
+TEST_F(ViewCommand, HasItsOwnPageOrSaysHowToGetIt) {
+    const ToolResult result = runTool({"view", movie(), "-o", output()});
+    if (ZULM_HAS_PAGE) {
+        EXPECT_EQ(result.exitCode, 0) << result.errors;
+        const std::string written = contentsOf(output());
+        EXPECT_LT(written.find("Content-Security-Policy"), written.find(s_element));
+        EXPECT_LT(written.find(s_element), written.find("</head>"));
+    } else {
+        EXPECT_EQ(result.exitCode, 1);
+        EXPECT_THAT(result.errors, HasSubstr("was built without the viewer's page, for which emscripten and npm are"));
+        EXPECT_FALSE(std::filesystem::exists(output()));
+    }
+}
+
 TEST_F(ViewCommand, PutsTheMetaDataInAsAFileThatReadsTheSame) {
     const std::string excerpt = folder / "excerpt.mp4";
     writeFile(excerpt, decoded(viewed(movie()).at("metadata")));
