@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cstring>
 #include <limits>
+#include <system_error>
 
 namespace ZULMetaData::detail {
 
@@ -100,8 +101,12 @@ FileInputBuffer::pos_type FileInputBuffer::startAt(pos_type position) {
 }
 
 bool FileInputBuffer::catchUp() {
-    if (filePosition_ != blockEnd_ && file_.pubseekpos(blockEnd_) == s_none)
+    if (filePosition_ == blockEnd_)
+        return true;
+    if (!file_.is_open())
         return false;
+    if (file_.pubseekpos(blockEnd_) == s_none) // as a failed read: the seek that it belongs to has passed for done
+        throw std::ios_base::failure("cannot be read", std::make_error_code(std::errc::io_error));
     filePosition_ = blockEnd_;
     return true;
 }

@@ -160,6 +160,23 @@ TEST_F(FileInputBuffer, HasNothingLeftOfAClosedFile) {
     EXPECT_FALSE(buffered.stream.seekg(2));
 }
 
+TEST_F(FileInputBuffer, TellsASeekThatFailsLateFromTheEndOfTheFile) {
+    struct BrokenFile final : std::filebuf {
+        bool isBroken = false;
+        pos_type seekpos(pos_type position, std::ios_base::openmode mode) override {
+            return isBroken ? pos_type(off_type(-1)) : std::filebuf::seekpos(position, mode);
+        }
+    } broken;
+    detail::FileInputBuffer buffer(broken);
+    broken.open(file("0123456789"), std::ios_base::in | std::ios_base::binary);
+    std::istream stream(&buffer);
+    stream.seekg(0, std::ios_base::end);
+    stream.seekg(4);
+    broken.isBroken = true;
+    EXPECT_EQ(stream.get(), std::istream::traits_type::eof());
+    EXPECT_TRUE(stream.bad());
+}
+
 TEST_F(FileInputBuffer, TellsThatAFolderCannotBeRead) {
     const TemporaryFolder folder;
     BufferedFile buffered(folder.path().string());
