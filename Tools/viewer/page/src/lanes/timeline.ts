@@ -248,7 +248,6 @@ export class Timeline {
       element.addEventListener('wheel', (event) => this.wheel(event), { passive: false });
     this.body.addEventListener('pointermove', (event) => this.point(event));
     this.body.addEventListener('pointerleave', () => void (this.pointerLine.hidden = this.tip.hidden = true));
-    this.body.addEventListener('dblclick', () => this.showAll());
   }
 
   private wheel(event: WheelEvent): void {
