@@ -115,7 +115,7 @@ bool FileInputBuffer::catchUp() {
 std::size_t FileInputBuffer::read(char* bytes, std::size_t size) {
     filePosition_ = -1;
     const std::streamsize got = file_.sgetn(bytes, static_cast<std::streamsize>(size));
-    filePosition_ = blockEnd_ += got;
+    leaveAt(blockEnd_ + got, got < static_cast<std::streamsize>(size));
     return static_cast<std::size_t>(got);
 }
 
@@ -147,7 +147,13 @@ void FileInputBuffer::readSmallestBlock() {
     char* start = size > 0 ? fileBlock_.data() + (StreamBufferAccess::getPosition(file_) - fileBlock_.data()) : nullptr;
     StreamBufferAccess::advanceGet(file_, size);
     setg(start, start, start + size);
-    filePosition_ = blockEnd_ += static_cast<off_type>(size);
+    leaveAt(blockEnd_ + static_cast<off_type>(size), size == 0);
+}
+
+/// A standard library may have to seek before it sees what is written behind an end that it has met.
+void FileInputBuffer::leaveAt(off_type position, bool isAtEnd) {
+    blockEnd_ = position;
+    filePosition_ = isAtEnd ? -1 : position;
 }
 
 } // namespace ZULMetaData::detail

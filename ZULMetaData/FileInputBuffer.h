@@ -39,13 +39,14 @@ private:
     std::size_t read(char* bytes, std::size_t size);
     void readBlock();
     void readSmallestBlock();
+    void leaveAt(off_type position, bool isAtEnd);
 
     std::filebuf& file_;
     std::array<char, s_smallestBlock> fileBlock_; // of `file_`
     std::unique_ptr<char[]> block_;               // for all but the smallest
     std::size_t blockSize_ = s_smallestBlock;
     off_type blockEnd_ = 0;
-    off_type filePosition_ = 0; // of `file_`; -1 where a failed read has left it anywhere
+    off_type filePosition_ = 0; // of `file_`; -1 where a failure or the end was met on the way
     off_type fileEnd_ = -1;     // as it was last asked for
 };
 
