@@ -131,6 +131,7 @@ export class Timeline {
 
   /// Brings a time into sight that is out of it.
   reveal(time: number): void {
+    this.time = time;
     const { from, to } = this.range;
     const length = to - from;
     if (time < from || time > to) this.setRange({ from: time - length * 0.1, to: time + length * 0.9 });

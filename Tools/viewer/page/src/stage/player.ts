@@ -113,7 +113,7 @@ export class Player {
   private watchFrames(): void {
     this.video.requestVideoFrameCallback?.((_, { mediaTime }) => {
       const passed = Math.abs(mediaTime - this.lastPicture);
-      if (passed > 1 / 250 && passed < this.shortestFrame) this.shortestFrame = passed;
+      if (passed > 1 / 250 && passed < 0.98 * this.shortestFrame) this.shortestFrame = passed;
       this.lastPicture = mediaTime;
       this.watchFrames();
     });
