@@ -17,8 +17,7 @@ mkdir -p "$folder"
 movie=$folder/Recording.mp4
 plain=$(mktemp --suffix=.mp4)
 trap 'rm -f "$plain"' EXIT
-ffmpeg -v error -y -f lavfi -i testsrc2=size=1280x720:rate=30 -f lavfi -i sine=frequency=330 -t 20 \
-    -c:v libx264 -preset ultrafast -pix_fmt yuv420p -c:a aac "$plain"
+scripts/desktop-movie.sh "$plain"
 packets_before=$(ffmpeg -v error -i "$plain" -map 0 -c copy -f streamhash -)
 
 echo "== recording a session and reading it back out of the movie"

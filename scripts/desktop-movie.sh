@@ -66,4 +66,4 @@ editor 17.25 20
 
 filter=$(IFS=,; echo "${boxes[*]}")
 ffmpeg -v error -y -f lavfi -i "gradients=s=1280x720:r=30:c0=0x1d3557:c1=0x6d597a:x0=0:y0=0:x1=1280:y1=720:nb_colors=2:speed=0.00001" \
-    -f lavfi -i sine=frequency=330 -t 20 -vf "$filter" -c:v libx264 -preset veryfast -crf 20 -pix_fmt yuv420p -c:a aac "$movie"
+    -f lavfi -i sine=frequency=330 -t 20 -vf "$filter" -af volume=0.1 -c:v libx264 -preset veryfast -crf 20 -pix_fmt yuv420p -c:a aac "$movie"

@@ -14,7 +14,7 @@ libcxx=(clang libc++-dev libc++abi-dev googletest)
 arm64=(g++-aarch64-linux-gnu qemu-user googletest libpng-dev:arm64 libtiff-dev:arm64 libfmt-dev:arm64 libre2-dev:arm64)
 macos=(binutils file)
 viewer=(emscripten nodejs)
-browser=(chromium fonts-dejavu-core fonts-liberation fonts-noto-color-emoji fonts-wqy-microhei)
+browser=(chromium fonts-dejavu-core fonts-inter fonts-liberation fonts-noto-color-emoji fonts-wqy-microhei)
 command -v npm >/dev/null || { macos+=(npm) viewer+=(npm); } # Node's own packages have it inside
 
 packages=()

@@ -1,10 +1,12 @@
-// Puts a recording of one hour into a movie: 60 cursor positions a second, 200 cursor images, 20,000 keys.
-// Usage: long_recording MOVIE FOLDER; the stream files are left in FOLDER.
+// Puts a recording of one hour into a movie: RATE cursor positions a second, 200 cursor images, 20,000 keys.
+// Usage: long_recording MOVIE FOLDER RATE; the stream files are left in FOLDER.
 
 #include "Tools/demo/Cursors.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
 #include <cmath>
+#include <cstdlib>
+#include <filesystem>
 #include <iostream>
 #include <vector>
 
@@ -28,11 +30,16 @@ ScreenPoint cursorAt(double seconds) {
     return {960 + 900 * std::sin(0.7 * moving + std::sin(0.13 * moving)), 540 + 480 * std::sin(1.1 * moving)};
 }
 
-void recordCursor(const FileLocation& locations, const FileLocation& actions, const FileLocation& images) {
+void recordPositions(const FileLocation& locations, int rate) {
     CursorLocationMetaDataWriter writer(locations);
-    for (int i = 0; i < 60 * s_duration; ++i)
-        writer.write(cursorAt(i / 60.0), at(i / 60.0));
+    for (int i = 0; i < rate * s_duration; ++i) {
+        const double time = static_cast<double>(i) / rate;
+        writer.write(cursorAt(time), at(time));
+    }
     writer.finish();
+}
+
+void recordCursor(const FileLocation& actions, const FileLocation& images) {
     CursorActionMetaDataWriter actionWriter(actions);
     for (double time = 2; time < s_duration - 1; time += 3.7) {
         actionWriter.write(std::fmod(time, 5) < 1 ? 4 : 1, at(time));
@@ -107,10 +114,11 @@ void recordMachine(const FileLocation& usages, const FileLocation& opacities, co
     slideWriter.finish();
 }
 
-void record(const FileLocation& movie, const FileLocation& folder) {
+void record(const FileLocation& movie, const FileLocation& folder, int rate) {
     std::vector<FileLocation> files;
     const auto file = [&](const char* name) { return files.emplace_back(folder / (std::string(name) + ".dat")); };
-    recordCursor(file("cursorLocation"), file("cursorAction"), file("cursorImage"));
+    recordPositions(file("cursorLocation"), rate);
+    recordCursor(file("cursorAction"), file("cursorImage"));
     recordKeys(file("keyboardAction"));
     recordScrolling(file("scrollAction"), file("hoverRect"));
     recordWindows(file("topmostWindow"), file("topmostAppName"), file("topmostWindowTitle"));
@@ -123,11 +131,12 @@ void record(const FileLocation& movie, const FileLocation& folder) {
 } // namespace
 
 int main(int count, char** arguments) {
-    if (count != 3) {
-        std::cerr << "usage: long_recording MOVIE FOLDER\n";
+    const int rate = count == 4 ? std::atoi(arguments[3]) : 0;
+    if (rate <= 0) {
+        std::cerr << "usage: long_recording MOVIE FOLDER RATE\n";
         return 1;
     }
     std::filesystem::create_directories(arguments[2]);
-    record(arguments[1], arguments[2]);
+    record(arguments[1], arguments[2], rate);
     return 0;
 }

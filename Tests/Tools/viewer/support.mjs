@@ -47,15 +47,15 @@ export function recordedSession() {
   return { movie: join(folder, 'Recording.mp4'), page: join(folder, 'Recording.html') };
 }
 
-/// An hour of metadata, with a movie of a picture a second.
-export function longRecording() {
-  const movie = join(folder, 'Hour.mp4');
+/// An hour of metadata with that many cursor positions a second, and a movie of a picture a second.
+export function longRecording(name, rate) {
+  const movie = join(folder, `${name}.mp4`);
   const picture = ['-f', 'lavfi', '-i', 'color=c=0x202633:s=640x360:r=1', '-t', '3600', '-g', '30'];
   const parameters = ['-v', 'error', '-y', ...picture, '-c:v', 'libx264', '-preset', 'ultrafast', '-pix_fmt', 'yuv420p', movie];
   execFileSync('ffmpeg', parameters, { stdio: ['ignore', 'ignore', 'inherit'] });
-  execFileSync(setting('ZULM_LONG_RECORDING'), [movie, join(folder, 'hour')]);
-  zulm('view', 'Hour.mp4', '-o', 'Hour.html');
-  return { movie, page: join(folder, 'Hour.html') };
+  execFileSync(setting('ZULM_LONG_RECORDING'), [movie, join(folder, name), String(rate)]);
+  zulm('view', `${name}.mp4`, '-o', `${name}.html`);
+  return { movie, page: join(folder, `${name}.html`) };
 }
 
 /// The page that `zulm view` wrote, without its recording.

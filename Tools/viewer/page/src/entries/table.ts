@@ -2,6 +2,7 @@
 
 import { countUntil } from '../model/search';
 import { make, setText } from '../ui/dom';
+import { measured } from '../ui/marks';
 import { uiScale } from '../ui/scale';
 import type { Rows } from './rows';
 
@@ -25,7 +26,7 @@ export class Table {
 
   constructor() {
     this.scroller.append(make('div', { role: 'rowgroup', class: 'table-top' }, this.head), this.space);
-    this.scroller.addEventListener('scroll', () => this.draw());
+    this.scroller.addEventListener('scroll', () => measured('zulm:table', () => this.draw()));
     this.scroller.addEventListener('keydown', (event) => this.press(event));
     this.space.addEventListener('click', (event) => this.click(event));
     new ResizeObserver(() => this.resize()).observe(this.scroller);

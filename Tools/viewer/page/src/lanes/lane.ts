@@ -148,8 +148,9 @@ export interface Band {
   colour: string;
 }
 
-/// Bands with names. What is narrower than a pixel stands for everything in that pixel.
-export function drawBands(canvas: LaneCanvas, times: Float64Array, band: (index: number) => Band): void {
+/// Bands with names, which are cut where they do not fit, or left out where `isWhole`. What is narrower than two pixels
+/// stands for everything in them.
+export function drawBands(canvas: LaneCanvas, times: Float64Array, band: (index: number) => Band, isWhole = false): void {
   const { context, palette } = canvas;
   const end = countBefore(times, canvas.range.to);
   context.font = `500 11px ${palette.font}`;
@@ -163,14 +164,16 @@ export function drawBands(canvas: LaneCanvas, times: Float64Array, band: (index:
     context.beginPath();
     context.roundRect(x, canvas.top + 3, width, canvas.height - 6, Math.min(3, width / 2));
     context.fill();
-    if (width > 24 && text) drawBandText(canvas, text, Math.max(0, x) + 6, right - 7, palette.bandText);
+    const room = { left: Math.max(0, x) + 6, right: right - 7 };
+    if (width > 24 && text) drawBandText(canvas, text, room, isWhole);
     i = right - x > 2 ? i + 1 : Math.max(i + 1, countBefore(times, canvas.time(x + 2)));
   }
 }
 
-function drawBandText({ context, top, height }: LaneCanvas, text: string, left: number, right: number, colour: string): void {
-  const shown = shortened(context, text, right - left);
-  if (shown !== text && shown.length < 5) return; // says nothing
-  context.fillStyle = colour;
-  context.fillText(shown, left, top + height / 2 + 0.5);
+function drawBandText(canvas: LaneCanvas, text: string, room: { left: number; right: number }, isWhole: boolean): void {
+  const { context, top, height, palette } = canvas;
+  const shown = shortened(context, text, room.right - room.left);
+  if (shown !== text && (isWhole || shown.length < 5)) return; // says nothing
+  context.fillStyle = palette.bandText;
+  context.fillText(shown, room.left, top + height / 2 + 0.5);
 }

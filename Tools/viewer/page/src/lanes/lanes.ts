@@ -313,12 +313,17 @@ function hoverLane(session: Session): Lane | undefined {
     title: 'Hover',
     height: 18,
     draw: (canvas) =>
-      drawBands(canvas, times, (index) => ({
-        start: times[index]!,
-        end: times[index + 1] ?? session.duration,
-        text: texts[index]!,
-        colour: index % 2 ? canvas.palette.line : canvas.palette.grid,
-      })),
+      drawBands(
+        canvas,
+        times,
+        (index) => ({
+          start: times[index]!,
+          end: times[index + 1] ?? session.duration,
+          text: texts[index]!,
+          colour: index % 2 ? canvas.palette.line : canvas.palette.grid,
+        }),
+        true,
+      ),
     valueAt: (time) => texts[lastAt(times, time)] ?? '',
   };
 }
