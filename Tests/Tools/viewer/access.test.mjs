@@ -16,7 +16,9 @@ async function faults(page) {
   assert.ok(passes.length > 10, `only ${passes.length} rules were checked`);
   return violations
     .filter(({ impact }) => impact === 'serious' || impact === 'critical')
-    .map(({ id, nodes }) => `${id}: ${nodes.map(({ html, failureSummary }) => `${html} ${failureSummary}`).join('; ')}`);
+    .map(
+      ({ id, nodes }) => `${id}: ${nodes.map(({ html, failureSummary }) => `${html} ${failureSummary}`).join('; ')}`,
+    );
 }
 
 const views = {
@@ -31,7 +33,10 @@ const views = {
 
 for (const [name, { path, show }] of Object.entries(views))
   test(`axe finds no serious fault: ${name}`, async () => {
-    for (const [theme, size] of [['dark', [1280, 800]], ['light', [360, 740]]]) {
+    for (const [theme, size] of [
+      ['dark', [1280, 800]],
+      ['light', [360, 740]],
+    ]) {
       const { page, close } = await open(path, { theme, size });
       if (path !== empty) {
         await opened(page);
@@ -44,7 +49,12 @@ for (const [name, { path, show }] of Object.entries(views))
     }
   });
 
-for (const size of [[360, 740], [768, 1024], [1280, 800], [3840, 2160]])
+for (const size of [
+  [360, 740],
+  [768, 1024],
+  [1280, 800],
+  [3840, 2160],
+])
   test(`nothing is wider than the screen at ${size.join(' by ')}`, async () => {
     const { page, close } = await open(recording.page, { size });
     await opened(page);

@@ -45,7 +45,10 @@ test('a movie that was cut is shown with what is wrong with it', async () => {
   await page.getByRole('tab', { name: /^Check/ }).click();
   assert.match(await textOf(page, '.verdict'), /damaged/);
   assert.ok((await page.locator('.finding').count()) > 0);
-  assert.deepEqual(problems.filter((problem) => !/movie|media/i.test(problem)), []);
+  assert.deepEqual(
+    problems.filter((problem) => !/movie|media/i.test(problem)),
+    [],
+  );
   await close();
 });
 
@@ -57,7 +60,8 @@ test('every damaged file is shown or refused, and the page lives on', async () =
   const told = { shown: 0, refused: 0 };
   for (const name of files) {
     await give(page, join(data, name));
-    const isRefused = (await page.locator('#notice').isVisible()) && (await textOf(page, '#notice-text')).includes('cannot be shown');
+    const isRefused =
+      (await page.locator('#notice').isVisible()) && (await textOf(page, '#notice-text')).includes('cannot be shown');
     ++told[isRefused ? 'refused' : 'shown'];
     if (isRefused) assert.match(await textOf(page, '#notice-text'), / cannot be shown: \S.{6,}/, name);
     else assert.equal(await textOf(page, '#recording-name'), name);
@@ -65,6 +69,9 @@ test('every damaged file is shown or refused, and the page lives on', async () =
   console.log(`${files.length} damaged files: ${told.shown} shown, ${told.refused} refused in words`);
   await give(page, recording.movie);
   assert.equal(await textOf(page, '#recording-name'), 'Recording.mp4');
-  assert.deepEqual(problems.filter((problem) => !/movie|media|ERR_/i.test(problem)), []);
+  assert.deepEqual(
+    problems.filter((problem) => !/movie|media|ERR_/i.test(problem)),
+    [],
+  );
   await close();
 });

@@ -13,7 +13,10 @@ const streams = new Map(JSON.parse(dump).files[0].streams.map(({ kind, entries }
 const times = [0.5, 1.55, 2.9, 4.25, 5.6, 8.05, 10.4, 13.1, 14.45, 18.7];
 
 function lastBefore(kind, time) {
-  return streams.get(kind).filter(({ timestamp }) => timestamp <= time).at(-1);
+  return streams
+    .get(kind)
+    .filter(({ timestamp }) => timestamp <= time)
+    .at(-1);
 }
 
 /// Those of the stream, in its order.
@@ -47,7 +50,9 @@ function patches(page, image, hotSpot, drawn, opacity, reach) {
       const side = 2 * reach + 1;
       const patch = (context, x, y, opacity) => {
         const { data } = context.getImageData(x - reach, y - reach, side, side);
-        return Array.from(data, (value, i) => Math.round((i % 4 === 3 ? value : (value * data[i - (i % 4) + 3]) / 255) * opacity));
+        return Array.from(data, (value, i) =>
+          Math.round((i % 4 === 3 ? value : (value * data[i - (i % 4) + 3]) / 255) * opacity),
+        );
       };
       const overlay = document.getElementById('overlay').getContext('2d');
       return {
@@ -85,7 +90,10 @@ test('the cursor has its hot spot where it was recorded', async () => {
     const { image, hotSpot } = cursorAt(time);
     const { opacity } = lastBefore('cursorOpacity', time);
     const { recorded, shown } = await patches(page, image, hotSpot, drawn, opacity, 3);
-    assert.ok(recorded.some((value) => value > 60), `the cursor can be seen at ${time}`);
+    assert.ok(
+      recorded.some((value) => value > 60),
+      `the cursor can be seen at ${time}`,
+    );
     recorded.forEach((value, i) => assert.ok(Math.abs(value - shown[i]) <= 3, `at ${time}: ${recorded} is ${shown}`));
     ++compared;
   }
@@ -96,12 +104,16 @@ test('the cursor has its hot spot where it was recorded', async () => {
 
 /// Of a subtitle file.
 function cues(text) {
-  const seconds = (clock) => clock.split(/[:,]/).reduce((sum, part, i) => sum + Number(part) * [3600, 60, 1, 0.001][i], 0);
+  const seconds = (clock) =>
+    clock.split(/[:,]/).reduce((sum, part, i) => sum + Number(part) * [3600, 60, 1, 0.001][i], 0);
   return text
     .trim()
     .split('\n\n')
     .map((cue) => cue.split('\n'))
-    .map(([, span, ...lines]) => ({ times: span.split(' --> ').map(seconds), text: lines.join('\n').replaceAll('\u2060', '') }));
+    .map(([, span, ...lines]) => ({
+      times: span.split(' --> ').map(seconds),
+      text: lines.join('\n').replaceAll('\u2060', ''),
+    }));
 }
 
 test('captions are those of the tool, masked until the reader asks', async () => {
@@ -109,7 +121,10 @@ test('captions are those of the tool, masked until the reader asks', async () =>
   await opened(page);
   const compare = async (...options) => {
     const all = cues(zulm('convert', '--to', 'srt', ...options, 'Recording.mp4'));
-    for (const { times: [, end], text } of all) {
+    for (const {
+      times: [, end],
+      text,
+    } of all) {
       await seek(page, end - 0.005); // when all its keys have been pressed
       assert.equal((await state(page)).caption, text, `at ${end}`);
       assert.equal(await page.locator('#caption').getAttribute('data-text'), text);
@@ -155,9 +170,17 @@ test('nothing leaves the page', async () => {
   await page.waitForTimeout(800);
   await page.keyboard.press('Space');
   for (const url of requests) assert.match(url, /^(file|blob|data):/);
-  assert.deepEqual([...new Set(requests.filter((url) => url.startsWith('file:')).map((url) => url.split('/').at(-1)))], ['Recording.html', 'Recording.mp4']);
+  assert.deepEqual(
+    [...new Set(requests.filter((url) => url.startsWith('file:')).map((url) => url.split('/').at(-1)))],
+    ['Recording.html', 'Recording.mp4'],
+  );
   assert.deepEqual(problems, []);
-  const refused = await page.evaluate(() => fetch('https://example.com/').then(() => false, () => true));
+  const refused = await page.evaluate(() =>
+    fetch('https://example.com/').then(
+      () => false,
+      () => true,
+    ),
+  );
   assert.ok(refused && problems.some((text) => text.includes('Content Security Policy')), problems.join());
   await close();
 });
@@ -232,9 +255,15 @@ test('everything is saved as the tool prints it, once the reader agrees', async 
   const { page, close } = await open(recording.page, { acceptDownloads: true });
   await opened(page);
   await page.getByLabel('Save all entries as a JSON file').click();
-  const [download] = await Promise.all([page.waitForEvent('download'), page.getByRole('button', { name: 'Save', exact: true }).click()]);
+  const [download] = await Promise.all([
+    page.waitForEvent('download'),
+    page.getByRole('button', { name: 'Save', exact: true }).click(),
+  ]);
   assert.equal(download.suggestedFilename(), 'Recording.mp4.json');
-  assert.deepEqual(JSON.parse(readFileSync(await download.path(), 'utf8')).files[0].streams, JSON.parse(dump).files[0].streams);
+  assert.deepEqual(
+    JSON.parse(readFileSync(await download.path(), 'utf8')).files[0].streams,
+    JSON.parse(dump).files[0].streams,
+  );
   await close();
 });
 
@@ -284,7 +313,10 @@ test('entries are filtered, lead to their time and are copied masked', async () 
 test('the movie may be missing: the recorded region stands for it', async () => {
   const lonely = join(folder, 'lonely');
   zulm('view', 'Recording.mp4', '-o', 'lonely.html');
-  const text = readFileSync(join(folder, 'lonely.html'), 'utf8').replace('"movie":"Recording.mp4"', '"movie":"Missing.mp4"');
+  const text = readFileSync(join(folder, 'lonely.html'), 'utf8').replace(
+    '"movie":"Recording.mp4"',
+    '"movie":"Missing.mp4"',
+  );
   writeFileSync(`${lonely}.html`, text);
   const { page, close } = await open(`${lonely}.html`);
   await opened(page);

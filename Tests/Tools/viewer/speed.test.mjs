@@ -1,9 +1,10 @@
 // A recording of one hour: how soon it is seen, and how long a picture takes while scrubbing.
 
 import assert from 'node:assert/strict';
-import { readFileSync } from 'node:fs';
+import { readFileSync, writeFileSync } from 'node:fs';
+import { join } from 'node:path';
 import { test } from 'node:test';
-import { longRecording, open, opened, zulm } from './support.mjs';
+import { emptyPage, folder, hugeMovie, longRecording, open, opened, zulm } from './support.mjs';
 
 const recording = longRecording('Hour', 60);
 
@@ -23,11 +24,16 @@ test('an hour is seen soon after opening', async () => {
     const { page, problems, close } = await open(recording.page);
     await opened(page);
     durations.push(await page.evaluate(() => performance.getEntriesByName('zulm:first-picture')[0].startTime));
-    assert.deepEqual(problems.filter((text) => !/movie|media|ERR_/i.test(text)), []);
+    assert.deepEqual(
+      problems.filter((text) => !/movie|media|ERR_/i.test(text)),
+      [],
+    );
     await close();
   }
   const size = (readFileSync(recording.page).length / 1048576).toFixed(1);
-  console.log(`first picture after ${durations.map((duration) => duration.toFixed(0)).join(', ')} ms, page of ${size} MiB`);
+  console.log(
+    `first picture after ${durations.map((duration) => duration.toFixed(0)).join(', ')} ms, page of ${size} MiB`,
+  );
   assert.ok(Math.min(...durations) < promised.firstPicture * tolerance);
 });
 
@@ -43,7 +49,9 @@ async function scripts(page, name = 'zulm:frame') {
 }
 
 function check(name, { count, middle, most }) {
-  console.log(`${name}: ${middle.toFixed(2)} ms of script in the middle, 95 % below ${most.toFixed(2)} ms, ${count} pictures`);
+  console.log(
+    `${name}: ${middle.toFixed(2)} ms of script in the middle, 95 % below ${most.toFixed(2)} ms, ${count} pictures`,
+  );
   assert.ok(middle < promised.script * tolerance);
 }
 
@@ -92,7 +100,9 @@ test('a table of a million entries scrolls and finds', async () => {
   const started = performance.now();
   await page.getByLabel('Filter entries').fill('name=terminal');
   await page.waitForFunction(() => / of /.test(document.querySelector('.entries-status').textContent));
-  await page.waitForFunction(() => !document.querySelector('.entries-status').textContent.includes('…'), null, { timeout: 60_000 });
+  await page.waitForFunction(() => !document.querySelector('.entries-status').textContent.includes('…'), null, {
+    timeout: 60_000,
+  });
   console.log(`filtering ${count} entries: ${(performance.now() - started).toFixed(0)} ms`);
   assert.match(await status.innerText(), /^3[78] of /);
   await page.getByLabel('Filter entries').fill('');
@@ -100,5 +110,20 @@ test('a table of a million entries scrolls and finds', async () => {
   await page.keyboard.press('End');
   await page.keyboard.press('Enter');
   assert.ok((await page.evaluate(() => zulmViewer.state().time)) > 3590);
+  await close();
+});
+
+test('a movie of 10 GiB opens at once', async () => {
+  const empty = join(folder, 'empty.html');
+  writeFileSync(empty, emptyPage(readFileSync(recording.page, 'utf8')));
+  const movie = hugeMovie(10);
+  const { page, close } = await open(empty);
+  const started = performance.now();
+  await page.setInputFiles('#file-input', movie);
+  await opened(page);
+  const duration = performance.now() - started;
+  console.log(`a movie of 10 GiB is open after ${duration.toFixed(0)} ms`);
+  assert.equal(await page.locator('#recording-name').innerText(), 'Huge.mp4');
+  assert.ok(duration < promised.firstPicture * 2 * tolerance);
   await close();
 });

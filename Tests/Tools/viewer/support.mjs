@@ -5,7 +5,7 @@
 
 import assert from 'node:assert/strict';
 import { execFileSync, spawnSync } from 'node:child_process';
-import { mkdtempSync, rmSync } from 'node:fs';
+import { mkdtempSync, rmSync, truncateSync, writeFileSync } from 'node:fs';
 import { createRequire } from 'node:module';
 import { tmpdir } from 'node:os';
 import { join } from 'node:path';
@@ -51,11 +51,37 @@ export function recordedSession() {
 export function longRecording(name, rate) {
   const movie = join(folder, `${name}.mp4`);
   const picture = ['-f', 'lavfi', '-i', 'color=c=0x202633:s=640x360:r=1', '-t', '3600', '-g', '30'];
-  const parameters = ['-v', 'error', '-y', ...picture, '-c:v', 'libx264', '-preset', 'ultrafast', '-pix_fmt', 'yuv420p', movie];
+  const parameters = [
+    '-v',
+    'error',
+    '-y',
+    ...picture,
+    '-c:v',
+    'libx264',
+    '-preset',
+    'ultrafast',
+    '-pix_fmt',
+    'yuv420p',
+    movie,
+  ];
   execFileSync('ffmpeg', parameters, { stdio: ['ignore', 'ignore', 'inherit'] });
   execFileSync(setting('ZULM_LONG_RECORDING'), [movie, join(folder, name), String(rate)]);
   zulm('view', `${name}.mp4`, '-o', `${name}.html`);
   return { movie, page: join(folder, `${name}.html`) };
+}
+
+const gigabyte = 1024 ** 3;
+
+/// A movie of that many gigabytes, nearly all of it a hole, with an hour of metadata behind it.
+export function hugeMovie(gigabytes) {
+  const path = join(folder, 'Huge.mp4');
+  const type = Buffer.from('\0\0\0\x14ftypisom\0\0\x02\0isom', 'latin1');
+  const pictures = Buffer.from('\0\0\0\x01mdat\0\0\0\0\0\0\0\0', 'latin1');
+  pictures.writeBigUInt64BE(BigInt(gigabytes * gigabyte), 8);
+  writeFileSync(path, Buffer.concat([type, pictures]));
+  truncateSync(path, type.length + gigabytes * gigabyte);
+  execFileSync(setting('ZULM_LONG_RECORDING'), [path, join(folder, 'huge'), '60']);
+  return path;
 }
 
 /// The page that `zulm view` wrote, without its recording.

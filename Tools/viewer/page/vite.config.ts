@@ -17,7 +17,7 @@ function policy(script: string, style: string): string {
     `style-src ${hash(style)}`,
     'worker-src blob:',
     "connect-src 'none'",
-    "img-src blob: data:",
+    'img-src blob: data:',
     "media-src 'self' file: blob: data:",
     "base-uri 'none'",
     "form-action 'none'",

@@ -91,7 +91,12 @@ export class App {
     if (!embedded) return;
     const { metadata, name, movie, info, verify } = embedded;
     this.setMovie(movie, movie ?? '');
-    void this.open(metadata, name, (decoded) => ({ ...decoded, info, verify, duration: info.duration ?? decoded.duration }));
+    void this.open(metadata, name, (decoded) => ({
+      ...decoded,
+      info,
+      verify,
+      duration: info.duration ?? decoded.duration,
+    }));
   }
 
   async openFile(file: File): Promise<void> {
@@ -287,12 +292,19 @@ export class App {
   private async save(): Promise<void> {
     const hasKeys = (this.session?.track('keyboardAction')?.count ?? 0) > 0;
     if (hasKeys && !this.stage.showsKeys) {
-      const agrees = await ask('Save with everything that was typed?', 'The file will hold every key in clear, though this page masks them.', 'Save');
+      const agrees = await ask(
+        'Save with everything that was typed?',
+        'The file will hold every key in clear, though this page masks them.',
+        'Save',
+      );
       if (!agrees) return;
     }
     try {
       const url = URL.createObjectURL(new Blob([await this.decoder.dump()], { type: 'application/json' }));
-      const link = Object.assign(document.createElement('a'), { href: url, download: `${this.session?.name ?? 'recording'}.json` });
+      const link = Object.assign(document.createElement('a'), {
+        href: url,
+        download: `${this.session?.name ?? 'recording'}.json`,
+      });
       link.click();
       setTimeout(() => URL.revokeObjectURL(url), 10_000);
     } catch (error) {

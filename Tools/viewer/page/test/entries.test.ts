@@ -24,27 +24,38 @@ const points = new Track({
 
 async function found(rows: Rows, query: string): Promise<number[]> {
   let result: number[] = [];
-  await filterRows(rows, testOf(query)!, () => false, (matches, isDone) => isDone && (result = [...matches]));
+  await filterRows(
+    rows,
+    testOf(query)!,
+    () => false,
+    (matches, isDone) => isDone && (result = [...matches]),
+  );
   return result;
 }
 
 test('all streams come by time, entries without a time come never', () => {
   const rows = new AllRows([keys, points], () => true);
   assert.equal(rows.count, 5);
-  assert.deepEqual([0, 1, 2, 3, 4].map((row) => [rows.time(row), rows.cell(row, 1)]), [
-    [1, 'Cursor location'],
-    [2, 'Keyboard action'],
-    [2, 'Cursor location'],
-    [2.5, 'Keyboard action'],
-    [3, 'Cursor location'],
-  ]);
+  assert.deepEqual(
+    [0, 1, 2, 3, 4].map((row) => [rows.time(row), rows.cell(row, 1)]),
+    [
+      [1, 'Cursor location'],
+      [2, 'Keyboard action'],
+      [2, 'Cursor location'],
+      [2.5, 'Keyboard action'],
+      [3, 'Cursor location'],
+    ],
+  );
   assert.equal(rows.rowAt(2.2), 2);
 });
 
 test('one stream comes as it is stored', () => {
   const rows = new StreamRows(points, () => true);
   assert.equal(rows.count, 4);
-  assert.deepEqual(rows.columns.map(({ title }) => title), ['Time', 'X', 'Y']);
+  assert.deepEqual(
+    rows.columns.map(({ title }) => title),
+    ['Time', 'X', 'Y'],
+  );
   assert.deepEqual([rows.cell(2, 0), rows.cell(2, 1), rows.cell(3, 0)], ['0:03.000', '900', 'NaN']);
 });
 
@@ -75,9 +86,18 @@ test('what was typed is neither shown nor found nor copied before the reader ask
 test('rows are copied as JSON and CSV', () => {
   const rows = new StreamRows(keys, () => true);
   assert.deepEqual(JSON.parse(asJSON(rows, [1])), [
-    { characterCode: 73, characterString: 'I', eventFlagsCode: 0, eventFlagsString: '<Shift>, "so"', timestamp: 2.5 },
+    {
+      characterCode: 73,
+      characterString: 'I',
+      eventFlagsCode: 0,
+      eventFlagsString: '<Shift>, "so"',
+      timestamp: 2.5,
+    },
   ]);
-  assert.equal(asCSV(rows, [1]), 'characterCode,characterString,eventFlagsCode,eventFlagsString,timestamp\n73,I,0,"<Shift>, ""so""",2.5\n');
+  assert.equal(
+    asCSV(rows, [1]),
+    'characterCode,characterString,eventFlagsCode,eventFlagsString,timestamp\n73,I,0,"<Shift>, ""so""",2.5\n',
+  );
 });
 
 test('copies of several streams have the columns of all', () => {

@@ -52,7 +52,10 @@ test('a rectangle keeps its corner and has its size scaled', () => {
 
 test('the hot spot of a cursor image lies on the location', () => {
   const placement = placementOf(region, 1, { width: 2560, height: 1440 });
-  const [location, hotSpot] = [{ x: 400, y: 300 }, { x: 5, y: 3 }];
+  const [location, hotSpot] = [
+    { x: 400, y: 300 },
+    { x: 5, y: 3 },
+  ];
   const rect = cursorImageRect(location, hotSpot, { width: 32, height: 24 }, placement);
   const spot = screenToVideo(location, placement);
   assert.deepEqual({ x: rect.x + hotSpot.x * 2, y: rect.y + hotSpot.y * 2 }, spot);
@@ -61,13 +64,22 @@ test('the hot spot of a cursor image lies on the location', () => {
 
 test('sizes are read where they are not properties of the image itself', () => {
   class Bitmap {
-    get width(): number { return 8; }
-    get height(): number { return 4; }
+    get width(): number {
+      return 8;
+    }
+    get height(): number {
+      return 4;
+    }
   }
   const rect = cursorImageRect({ x: 160, y: 90 }, { x: 0, y: 0 }, new Bitmap(), placementOf(region, 1, undefined));
   assert.deepEqual(rect, { x: 0, y: 0, width: 8, height: 4 });
 });
 
 test('a frame fits into its room and lies in the middle', () => {
-  assert.deepEqual(fitted({ width: 1280, height: 720 }, { width: 640, height: 640 }), { x: 0, y: 140, width: 640, height: 360 });
+  assert.deepEqual(fitted({ width: 1280, height: 720 }, { width: 640, height: 640 }), {
+    x: 0,
+    y: 140,
+    width: 640,
+    height: 360,
+  });
 });

@@ -48,22 +48,31 @@ test('what was typed is masked, keys that type nothing are not', () => {
 test('keys near each other make a caption, Return ends it', () => {
   const keys = track([1, 72, 'H'], [1.2, 73, 'I'], [1.4, 13, 'returnKey'], [1.6, 79, 'O'], [3, 75, 'K']);
   const captions = captionsOf(keys, true);
-  assert.deepEqual(captions.map(({ text, start, end }) => [text, start, end]), [
-    ['HI [returnKey]', 1, 2.9],
-    ['O', 1.6, 3.1],
-    ['K', 3, 4.5],
-  ]);
+  assert.deepEqual(
+    captions.map(({ text, start, end }) => [text, start, end]),
+    [
+      ['HI [returnKey]', 1, 2.9],
+      ['O', 1.6, 3.1],
+      ['K', 3, 4.5],
+    ],
+  );
 });
 
 test('a caption is no longer than a line', () => {
   const many = captionsOf(track(...Array.from({ length: 50 }, (_, i): Key => [i / 10, 65, 'A'])), true);
-  assert.deepEqual(many.map(({ text }) => text.length), [42, 8]);
+  assert.deepEqual(
+    many.map(({ text }) => text.length),
+    [42, 8],
+  );
 });
 
 test('keys appear as they are pressed', () => {
   const captions = captionsOf(track([1, 72, 'H'], [1.2, 73, 'I'], [1.4, 83, 'S', '<Cmd>']), true);
   const at = (time: number) => captionAt(captions, 0, time)?.text;
-  assert.deepEqual([at(0.9), at(1), at(1.3), at(1.5), at(2.8), at(2.9)], [undefined, 'H', 'HI', 'HI ⌘S', 'HI ⌘S', undefined]);
+  assert.deepEqual(
+    [at(0.9), at(1), at(1.3), at(1.5), at(2.8), at(2.9)],
+    [undefined, 'H', 'HI', 'HI ⌘S', 'HI ⌘S', undefined],
+  );
 });
 
 test('the next caption takes the place of one that is still there', () => {

@@ -39,9 +39,14 @@ test('searching counts what lies before a time', () => {
 });
 
 test('a track brings its entries into the order of their times, and leaves out those without', () => {
-  const track = new Track(entries('scrollAction', [3, Number.NaN, 1, 2, Infinity], { y: Int32Array.of(30, 0, 10, 20, 0) }));
+  const track = new Track(
+    entries('scrollAction', [3, Number.NaN, 1, 2, Infinity], { y: Int32Array.of(30, 0, 10, 20, 0) }),
+  );
   assert.deepEqual([...track.times], [1, 2, 3]);
-  assert.deepEqual([0, 1, 2].map((i) => track.number('y', i)), [10, 20, 30]);
+  assert.deepEqual(
+    [0, 1, 2].map((i) => track.number('y', i)),
+    [10, 20, 30],
+  );
   assert.equal(track.row(0), 2);
   assert.equal(track.at(2.5), 1);
 });
@@ -57,7 +62,10 @@ test('an entry without an image shows the one that came with its number before',
     }),
   );
   const shown = cursorAppearances(track);
-  assert.deepEqual(shown.map(({ image }) => image.length && image[0]), [0, 1, 2, 1, 2]);
+  assert.deepEqual(
+    shown.map(({ image }) => image.length && image[0]),
+    [0, 1, 2, 1, 2],
+  );
   assert.deepEqual(shown[3]!.hotSpot, { x: 5, y: 3 });
 });
 
@@ -68,10 +76,20 @@ test('a button is held until it comes up', () => {
     }),
   );
   const clicks = clicksOf(track, 20);
-  assert.deepEqual(clicks.map(({ button, start, end }) => [button, start, end]), [['left', 1, 2.5], ['right', 2, 3], ['middle', 4, 5]]);
+  assert.deepEqual(
+    clicks.map(({ button, start, end }) => [button, start, end]),
+    [
+      ['left', 1, 2.5],
+      ['right', 2, 3],
+      ['middle', 4, 5],
+    ],
+  );
   assert.equal(clickLabel(clicks[0]!), '⇧⌘ left');
   const starts = Float64Array.from(clicks, ({ start }) => start);
-  assert.deepEqual(clicksAround(clicks, starts, 2.2, 0.6).map(({ button }) => button), ['right', 'left']);
+  assert.deepEqual(
+    clicksAround(clicks, starts, 2.2, 0.6).map(({ button }) => button),
+    ['right', 'left'],
+  );
   assert.deepEqual(clicksAround(clicks, starts, 3.5, 0.2), []);
 });
 
@@ -91,10 +109,16 @@ test('markers are clicks, windows and slides', () => {
 test('the person is idle where nothing moves for three seconds', () => {
   const still = (length: number) => new Int32Array(length).fill(4);
   const { idle } = session(
-    entries('cursorLocation', [0, 1, 2, 3, 4, 5, 6, 7, 8], { x: Int32Array.of(1, 2, 2, 2, 2, 2, 3, 3, 3), y: still(9) }),
+    entries('cursorLocation', [0, 1, 2, 3, 4, 5, 6, 7, 8], {
+      x: Int32Array.of(1, 2, 2, 2, 2, 2, 3, 3, 3),
+      y: still(9),
+    }),
     entries('keyboardAction', [8, 18.5]),
   );
-  assert.deepEqual(idle, [{ start: 1, end: 6 }, { start: 8, end: 18.5 }]);
+  assert.deepEqual(idle, [
+    { start: 1, end: 6 },
+    { start: 8, end: 18.5 },
+  ]);
 });
 
 test('a recording without any input is not idle: nothing is known', () => {
@@ -103,7 +127,12 @@ test('a recording without any input is not idle: nothing is known', () => {
 
 test('the last region with an area is the recorded one, and the length covers every entry', () => {
   const recording = session(
-    entries('recordingRegion', [0, 1], { x: Int32Array.of(1, 9), y: Int32Array.of(2, 9), width: Int32Array.of(3, 0), height: Int32Array.of(4, 9) }),
+    entries('recordingRegion', [0, 1], {
+      x: Int32Array.of(1, 9),
+      y: Int32Array.of(2, 9),
+      width: Int32Array.of(3, 0),
+      height: Int32Array.of(4, 9),
+    }),
     entries('cpuUsage', [0, 25.5]),
   );
   assert.deepEqual(recording.region, { x: 1, y: 2, width: 3, height: 4 });
@@ -111,7 +140,9 @@ test('the last region with an area is the recorded one, and the length covers ev
 });
 
 test('the place where the cursor stayed longest is the warmest', () => {
-  const track = new Track(entries('cursorLocation', [0, 1, 4], { x: Int32Array.of(320, 960, 100), y: Int32Array.of(270, 810, 100) }));
+  const track = new Track(
+    entries('cursorLocation', [0, 1, 4], { x: Int32Array.of(320, 960, 100), y: Int32Array.of(270, 810, 100) }),
+  );
   const placement = placementOf({ x: 0, y: 0, width: 1280, height: 1080 }, 1, undefined);
   const heat = heatOf(track, placement, 0, 4);
   const at = (x: number, y: number) => heat[Math.floor(y * heatHeight) * heatWidth + Math.floor(x * heatWidth)]!;

@@ -78,11 +78,14 @@ function keyboardAction(duration: number): Entries {
     names.push(name);
     flags.push(modifiers);
   };
-  const words = 'the quick recorder keeps every key that was pressed and shows it over the movie'.toUpperCase().split(' ');
-  for (let t = 1.5; t < duration - 2; ) {
+  const words = 'the quick recorder keeps every key that was pressed and shows it over the movie'
+    .toUpperCase()
+    .split(' ');
+  for (let t = 1.5; t < duration - 2;) {
     const burst = Math.min(duration - 2, t + 4 + random() * 8);
     while (t < burst) {
-      for (const letter of words[Math.floor(random() * words.length)]!) push((t += 0.07 + random() * 0.06), letter.charCodeAt(0), letter, '(IsVK)');
+      for (const letter of words[Math.floor(random() * words.length)]!)
+        push((t += 0.07 + random() * 0.06), letter.charCodeAt(0), letter, '(IsVK)');
       push((t += 0.09), 32, 'space', '(IsVK)');
     }
     if (random() < 0.5) push((t += 0.2), 13, 'returnKey', '(IsVK)');
@@ -116,13 +119,18 @@ function windows(duration: number): Entries[] {
 
 function hoverRect(locations: Entries): Entries {
   const rows = Array.from({ length: Math.floor(locations.time.length / 6) }, (_, i) => i * 6);
-  const snapped = (name: string, step: number) => Int32Array.from(rows, (row) => Math.floor(Number(locations.columns[name]![row]) / step) * step);
-  return entries('hoverRect', rows.map((row) => locations.time[row]!), {
-    x: snapped('x', 160),
-    y: snapped('y', 90),
-    width: new Int32Array(rows.length).fill(160),
-    height: new Int32Array(rows.length).fill(90),
-  });
+  const snapped = (name: string, step: number) =>
+    Int32Array.from(rows, (row) => Math.floor(Number(locations.columns[name]![row]) / step) * step);
+  return entries(
+    'hoverRect',
+    rows.map((row) => locations.time[row]!),
+    {
+      x: snapped('x', 160),
+      y: snapped('y', 90),
+      width: new Int32Array(rows.length).fill(160),
+      height: new Int32Array(rows.length).fill(90),
+    },
+  );
 }
 
 function scrollAction(duration: number): Entries {
@@ -143,7 +151,9 @@ function slides(duration: number): Entries[] {
   const time: number[] = [];
   for (let t = 30; t < duration; t += 150) time.push(t);
   return [
-    entries('slideTitles', time, { title: time.map((_, i) => `${i + 1}. ${['Where we are', 'Numbers', 'What comes next', 'Questions'][i % 4]}`) }),
+    entries('slideTitles', time, {
+      title: time.map((_, i) => `${i + 1}. ${['Where we are', 'Numbers', 'What comes next', 'Questions'][i % 4]}`),
+    }),
     entries('slideText', time, { text: time.map((_, i) => `Text of slide ${i + 1}`) }),
     entries('slideComment', time, { comment: time.map((_, i) => (i % 3 ? '' : 'Mention the source')) }),
   ];
@@ -159,9 +169,13 @@ function machine(duration: number): Entries[] {
   });
   return [
     entries('cpuUsage', time, { cpuUsage }),
-    entries('cursorOpacity', [0, 600, 600.2, 640, 640.2].filter((t) => t < duration), {
-      opacity: Float64Array.from([1, 0.6, 0.3, 0.7, 1]),
-    }),
+    entries(
+      'cursorOpacity',
+      [0, 600, 600.2, 640, 640.2].filter((t) => t < duration),
+      {
+        opacity: Float64Array.from([1, 0.6, 0.3, 0.7, 1]),
+      },
+    ),
     entries('recordingRegion', [0], {
       x: Int32Array.of(region.x),
       y: Int32Array.of(region.y),
@@ -182,8 +196,8 @@ function machine(duration: number): Entries[] {
 const arrow = Uint8Array.from(
   atob(
     'iVBORw0KGgoAAAANSUhEUgAAABgAAAAYCAQAAABKfvVzAAAAZElEQVR42sXTSQ7AIAwDQP//06YUoUBZYp/qKxmBQgI+gRPS' +
-    'JKRJ3mKHNGCQDmQSQCQjkMgMBPIFKVlBQk7gSHbgStYuRfKfpjBZY6Hc1lYkjmE8Qbwjju25BUhzneztqwS/pwBGSRf3Fj6W' +
-    'QgAAAABJRU5ErkJggg==',
+      'JKRJ3mKHNGCQDmQSQCQjkMgMBPIFKVlBQk7gSHbgStYuRfKfpjBZY6Hc1lYkjmE8Qbwjju25BUhzneztqwS/pwBGSRf3Fj6W' +
+      'QgAAAABJRU5ErkJggg==',
   ),
   (character) => character.charCodeAt(0),
 );

@@ -14,7 +14,8 @@ function comparing(name: string, operator: string, wanted: string): Test {
     const value = rows.value(row, name === 'time' ? 'timestamp' : name);
     if (value === undefined || value === null) return false;
     if (operator === '=' || operator === '!=') {
-      const isEqual = isNumber && typeof value === 'number' ? value === number : String(value).toLowerCase().includes(text);
+      const isEqual =
+        isNumber && typeof value === 'number' ? value === number : String(value).toLowerCase().includes(text);
       return isEqual === (operator === '=');
     }
     const left = Number(value);
@@ -35,7 +36,11 @@ function containing(word: string): Test {
 
 /// Words in quotation marks may hold spaces. Every word must fit. Null where nothing is looked for.
 export function testOf(query: string): Test | null {
-  const words = query.match(/[^\s"]*"[^"]*"?|\S+/g)?.map((word) => word.replaceAll('"', '')).filter(Boolean) ?? [];
+  const words =
+    query
+      .match(/[^\s"]*"[^"]*"?|\S+/g)
+      ?.map((word) => word.replaceAll('"', ''))
+      .filter(Boolean) ?? [];
   const tests = words.map((word) => {
     const parts = comparison.exec(word);
     return parts ? comparing(parts[1]!, parts[2]!, parts[3]!) : containing(word.toLowerCase());
@@ -54,7 +59,7 @@ export async function filterRows(
 ): Promise<void> {
   let matches = new Uint32Array(1024);
   let used = 0;
-  for (let row = 0; row < rows.count; ) {
+  for (let row = 0; row < rows.count;) {
     const end = performance.now() + slice;
     while (row < rows.count && performance.now() < end)
       for (const stop = Math.min(rows.count, row + 256); row < stop; ++row) {

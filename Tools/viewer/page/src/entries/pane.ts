@@ -39,14 +39,25 @@ export class EntriesPane {
   private readonly note = make('p', { class: 'entries-note', hidden: true });
 
   constructor(private readonly events: EntriesEvents) {
-    const find = make('div', { class: 'find' }, this.query,
+    const find = make(
+      'div',
+      { class: 'find' },
+      this.query,
       this.tool('up', 'Previous match', () => this.step(-1)),
-      this.tool('down', 'Next match', () => this.step(1)));
-    const tools = make('div', { class: 'entries-tools' }, this.status,
+      this.tool('down', 'Next match', () => this.step(1)),
+    );
+    const tools = make(
+      'div',
+      { class: 'entries-tools' },
+      this.status,
       this.tool('copy', 'Copy as JSON', () => void this.copy('JSON', asJSON), 'JSON'),
       this.tool('copy', 'Copy as CSV', () => void this.copy('CSV', asCSV), 'CSV'),
-      this.tool('save', 'Save all entries as a JSON file', () => this.events.onSave()));
-    byId('pane-entries').append(make('div', { class: 'entries-head' }, this.stream, find, tools, this.note), this.table.element);
+      this.tool('save', 'Save all entries as a JSON file', () => this.events.onSave()),
+    );
+    byId('pane-entries').append(
+      make('div', { class: 'entries-head' }, this.stream, find, tools, this.note),
+      this.table.element,
+    );
     this.stream.addEventListener('change', () => this.choose(this.stream.value));
     this.query.addEventListener('input', () => this.filter());
     this.query.addEventListener('keydown', (event) => {
@@ -58,7 +69,16 @@ export class EntriesPane {
   }
 
   private tool(icon: string, name: string, action: () => void, text = ''): HTMLButtonElement {
-    const button = make('button', { type: 'button', class: text ? 'button is-small' : 'button is-icon is-small', 'aria-label': name, title: name }, text);
+    const button = make(
+      'button',
+      {
+        type: 'button',
+        class: text ? 'button is-small' : 'button is-icon is-small',
+        'aria-label': name,
+        title: name,
+      },
+      text,
+    );
     setIcon(button, icon);
     button.addEventListener('click', action);
     return button;
@@ -67,7 +87,9 @@ export class EntriesPane {
   show(session: Session): void {
     this.session = session;
     const option = (value: string, text: string) => make('option', { value }, text);
-    const streams = session.allTracks().map(({ kind, entries }) => option(kind, `${titleOf(kind)} (${count(entries.time.length)})`));
+    const streams = session
+      .allTracks()
+      .map(({ kind, entries }) => option(kind, `${titleOf(kind)} (${count(entries.time.length)})`));
     const all = session.allTracks().reduce((sum, { count }) => sum + count, 0);
     this.stream.replaceChildren(option('', `All streams (${count(all)})`), ...streams);
     this.query.value = '';
@@ -117,7 +139,12 @@ export class EntriesPane {
     const search = ++this.search;
     const test = testOf(this.query.value);
     if (!test) return this.showMatches(rows, null, true);
-    void filterRows(rows, test, () => search !== this.search, (matches, isDone) => this.showMatches(rows, matches, isDone));
+    void filterRows(
+      rows,
+      test,
+      () => search !== this.search,
+      (matches, isDone) => this.showMatches(rows, matches, isDone),
+    );
   }
 
   private showMatches(rows: Rows, matches: Uint32Array | null, isDone: boolean): void {
@@ -153,7 +180,9 @@ export class EntriesPane {
     if (!this.rows) return;
     const wanted = [...this.table.wanted()];
     if (wanted.length > mostCopied)
-      return this.events.onProblem(`${plural(wanted.length, 'entry', 'entries')} are too many to copy: filter them first, or save them as a file.`);
+      return this.events.onProblem(
+        `${plural(wanted.length, 'entry', 'entries')} are too many to copy: filter them first, or save them as a file.`,
+      );
     try {
       await copyText(write(this.rows, wanted));
       setText(this.status, `${plural(wanted.length, 'entry', 'entries')} copied as ${name}`);

@@ -38,7 +38,10 @@ export class Table {
       i === 0 ? '4.75rem' : name === 'kind' ? '8rem' : isNumber ? 'minmax(3.5rem, 1fr)' : 'minmax(7rem, 2fr)',
     );
     this.scroller.style.setProperty('--columns', widths.join(' '));
-    this.scroller.style.setProperty('--least', `${rows.columns.reduce((sum, { isNumber }, i) => sum + (i === 0 ? 5.5 : isNumber ? 4.25 : 7.75), 1.5)}rem`);
+    this.scroller.style.setProperty(
+      '--least',
+      `${rows.columns.reduce((sum, { isNumber }, i) => sum + (i === 0 ? 5.5 : isNumber ? 4.25 : 7.75), 1.5)}rem`,
+    );
     this.head.replaceChildren(
       ...rows.columns.map(({ title, isNumber }) =>
         make('div', { role: 'columnheader', class: isNumber ? 'is-number' : undefined, title }, title),
@@ -150,7 +153,9 @@ export class Table {
   }
 
   private newRow(columns: Rows['columns']): HTMLElement {
-    const cells = columns.map(({ isNumber }) => make('div', { role: 'gridcell', class: isNumber ? 'is-number' : undefined }));
+    const cells = columns.map(({ isNumber }) =>
+      make('div', { role: 'gridcell', class: isNumber ? 'is-number' : undefined }),
+    );
     const row = make('div', { class: 'table-row', role: 'row' }, ...cells);
     this.space.append(row);
     return row;

@@ -32,7 +32,11 @@ function optional(title: string, facts: Fact[]): Node[] {
 }
 
 function recordingFacts({ name, container, info }: Session, duration: number): Fact[] {
-  const facts: Fact[] = [['Name', name], ['Container', container], ['Length', clock(duration)]];
+  const facts: Fact[] = [
+    ['Name', name],
+    ['Container', container],
+    ['Length', clock(duration)],
+  ];
   if (typeof info.bytes === 'number') facts.push(['Size', bytes(info.bytes)]);
   for (const warning of info.warnings ?? [])
     facts.push(['Warning', typeof warning === 'string' ? warning : JSON.stringify(warning)]);
@@ -76,21 +80,38 @@ const machineNames: Record<string, string> = {
 function machineFacts(session: Session): Fact[] {
   const track = session.track('systemData');
   if (!track || track.count === 0) return [];
-  return Object.entries(machineNames).map(([column, name]) => [name, track.text(column, 0).replace(/^[A-Za-z]+:/, '') || '–']);
+  return Object.entries(machineNames).map(([column, name]) => [
+    name,
+    track.text(column, 0).replace(/^[A-Za-z]+:/, '') || '–',
+  ]);
 }
 
 function streamTable({ streams }: Session): HTMLElement {
-  const head = make('tr', {}, ...['Stream', 'Entries', 'First', 'Last', 'Bytes'].map((title) => make('th', { scope: 'col' }, title)));
+  const head = make(
+    'tr',
+    {},
+    ...['Stream', 'Entries', 'First', 'Last', 'Bytes'].map((title) => make('th', { scope: 'col' }, title)),
+  );
   const time = (value: number | undefined) => (value === undefined ? '–' : clock(value, 2));
   const rows = streams.map(({ kind, uuid, entries, first, last, bytes: size, known }) =>
-    make('tr', {},
+    make(
+      'tr',
+      {},
       make('th', { scope: 'row', title: uuid }, titleOf(kind)),
-      ...[known ? count(entries) : 'unknown', time(first), time(last), count(size)].map((text) => make('td', {}, text))));
-  return make('div', { class: 'table-scroll', tabindex: 0, role: 'group', 'aria-label': 'Streams' }, make('table', {}, make('thead', {}, head), make('tbody', {}, ...rows)));
+      ...[known ? count(entries) : 'unknown', time(first), time(last), count(size)].map((text) => make('td', {}, text)),
+    ),
+  );
+  return make(
+    'div',
+    { class: 'table-scroll', tabindex: 0, role: 'group', 'aria-label': 'Streams' },
+    make('table', {}, make('thead', {}, head), make('tbody', {}, ...rows)),
+  );
 }
 
 function allFindings({ verify }: Session): Finding[] {
-  const ofStreams = (verify.streams ?? []).flatMap(({ kind, findings }) => (findings ?? []).map((finding) => ({ kind, ...finding })));
+  const ofStreams = (verify.streams ?? []).flatMap(({ kind, findings }) =>
+    (findings ?? []).map((finding) => ({ kind, ...finding })),
+  );
   return [...(verify.findings ?? []), ...ofStreams];
 }
 
@@ -103,14 +124,39 @@ function sentence(finding: Finding): string {
 export function showCheck(session: Session): void {
   const findings = allFindings(session);
   const isDamaged = session.verify.damaged === true;
-  const verdict = make('p', { class: `verdict ${isDamaged ? 'is-bad' : 'is-good'}` },
-    make('span', {}, isDamaged ? 'This recording is damaged.' : findings.length ? 'Nothing is damaged.' : 'Nothing is wrong with this recording.'));
+  const verdict = make(
+    'p',
+    { class: `verdict ${isDamaged ? 'is-bad' : 'is-good'}` },
+    make(
+      'span',
+      {},
+      isDamaged
+        ? 'This recording is damaged.'
+        : findings.length
+          ? 'Nothing is damaged.'
+          : 'Nothing is wrong with this recording.',
+    ),
+  );
   setIcon(verdict, isDamaged ? 'bad' : 'good');
   const items = findings.map((finding) => {
-    const place = [finding.kind ?? finding.stream, typeof finding.offset === 'number' && `offset ${count(finding.offset)}`].filter(Boolean).join(', ');
-    return make('li', { class: `finding is-${finding.severity ?? 'notice'}` }, make('p', {}, sentence(finding)), make('p', { class: 'quiet' }, place));
+    const place = [
+      finding.kind ?? finding.stream,
+      typeof finding.offset === 'number' && `offset ${count(finding.offset)}`,
+    ]
+      .filter(Boolean)
+      .join(', ');
+    return make(
+      'li',
+      { class: `finding is-${finding.severity ?? 'notice'}` },
+      make('p', {}, sentence(finding)),
+      make('p', { class: 'quiet' }, place),
+    );
   });
-  byId('pane-verify').replaceChildren(verdict, ...(items.length ? [make('ul', { class: 'findings' }, ...items)] : []), coverage(session));
+  byId('pane-verify').replaceChildren(
+    verdict,
+    ...(items.length ? [make('ul', { class: 'findings' }, ...items)] : []),
+    coverage(session),
+  );
   const badge = byId('finding-count');
   badge.hidden = findings.length === 0;
   badge.textContent = String(findings.length);
@@ -118,5 +164,9 @@ export function showCheck(session: Session): void {
 
 function coverage({ streams }: Session): HTMLElement {
   const entries = streams.reduce((sum, stream) => sum + stream.entries, 0);
-  return make('p', { class: 'quiet' }, `${plural(streams.length, 'stream')} with ${plural(entries, 'entry', 'entries')} were checked.`);
+  return make(
+    'p',
+    { class: 'quiet' },
+    `${plural(streams.length, 'stream')} with ${plural(entries, 'entry', 'entries')} were checked.`,
+  );
 }

@@ -88,7 +88,8 @@ export function drawArea(canvas: LaneCanvas, curve: Curve, colour: string, alpha
     area.rect(x, y, columnWidth, bottom - y);
     last = x;
   });
-  const isCrowded = countBefore(curve.times, canvas.range.to) - countBefore(curve.times, canvas.range.from) > 4 * canvas.width;
+  const isCrowded =
+    countBefore(curve.times, canvas.range.to) - countBefore(curve.times, canvas.range.from) > 4 * canvas.width;
   context.globalAlpha = isCrowded ? 2.2 * alpha : alpha;
   context.fillStyle = colour;
   context.fill(area);
@@ -105,7 +106,10 @@ export function drawLine(canvas: LaneCanvas, curve: Curve, colour: string): void
   const line = new Path2D();
   let last = -2;
   columns(canvas, curve.times, (x, first, end) => {
-    const [least, greatest] = curve.extremes.of(first, end).map((value) => yOf(canvas, curve, value)) as [number, number];
+    const [least, greatest] = curve.extremes.of(first, end).map((value) => yOf(canvas, curve, value)) as [
+      number,
+      number,
+    ];
     if (x !== last + columnWidth) line.moveTo(x, least);
     else line.lineTo(x, least);
     if (greatest !== least) line.lineTo(x, greatest);
@@ -150,12 +154,17 @@ export interface Band {
 
 /// Bands with names, which are cut where they do not fit, or left out where `isWhole`. What is narrower than two pixels
 /// stands for everything in them.
-export function drawBands(canvas: LaneCanvas, times: Float64Array, band: (index: number) => Band, isWhole = false): void {
+export function drawBands(
+  canvas: LaneCanvas,
+  times: Float64Array,
+  band: (index: number) => Band,
+  isWhole = false,
+): void {
   const { context, palette } = canvas;
   const end = countBefore(times, canvas.range.to);
   context.font = `500 11px ${palette.font}`;
   context.textBaseline = 'middle';
-  for (let i = Math.max(0, countUntil(times, canvas.range.from) - 1); i < end; ) {
+  for (let i = Math.max(0, countUntil(times, canvas.range.from) - 1); i < end;) {
     const { start, end: stop, text, colour } = band(i);
     const x = Math.max(-4, canvas.x(start));
     const right = Math.min(canvas.width + 4, canvas.x(stop));

@@ -51,17 +51,19 @@ class NameColours {
 function textLane(session: Session, kind: string, column: string, title: string): Lane | undefined {
   const track = filled(session, kind);
   const colours = new NameColours();
-  return track && {
-    title,
-    height: 23,
-    draw: (canvas) =>
-      drawBands(canvas, track.times, (index) => {
-        const text = track.text(column, index);
-        const colour = colours.of(appAt(session, track.times[index]!) || text, canvas.palette);
-        return { start: track.times[index]!, end: track.endOf(index, session.duration), text, colour };
-      }),
-    valueAt: (time) => textAt(track, column, time),
-  };
+  return (
+    track && {
+      title,
+      height: 23,
+      draw: (canvas) =>
+        drawBands(canvas, track.times, (index) => {
+          const text = track.text(column, index);
+          const colour = colours.of(appAt(session, track.times[index]!) || text, canvas.palette);
+          return { start: track.times[index]!, end: track.endOf(index, session.duration), text, colour };
+        }),
+      valueAt: (time) => textAt(track, column, time),
+    }
+  );
 }
 
 function appAt(session: Session, time: number): string {
@@ -75,20 +77,27 @@ function textAt(track: Track, column: string, time: number): string {
 }
 
 function slideLane(session: Session): Lane | undefined {
-  const kinds: [string, string][] = [['slideTitles', 'title'], ['slideText', 'text'], ['slideComment', 'comment']];
+  const kinds: [string, string][] = [
+    ['slideTitles', 'title'],
+    ['slideText', 'text'],
+    ['slideComment', 'comment'],
+  ];
   const [kind, column] = kinds.find(([kind]) => filled(session, kind)) ?? ['', ''];
   const lane = textLane(session, kind, column, 'Slides');
   const track = session.track(kind);
-  return lane && track && {
-    ...lane,
-    draw: (canvas) =>
-      drawBands(canvas, track.times, (index) => ({
-        start: track.times[index]!,
-        end: track.endOf(index, session.duration),
-        text: track.text(column, index),
-        colour: canvas.palette.bands[index % 2]!,
-      })),
-  };
+  return (
+    lane &&
+    track && {
+      ...lane,
+      draw: (canvas) =>
+        drawBands(canvas, track.times, (index) => ({
+          start: track.times[index]!,
+          end: track.endOf(index, session.duration),
+          text: track.text(column, index),
+          colour: canvas.palette.bands[index % 2]!,
+        })),
+    }
+  );
 }
 
 function rectText(track: Track, time: number): string {
@@ -132,7 +141,7 @@ function clickLane({ clicks }: Session): Lane | undefined {
       const end = countBefore(starts, canvas.range.to);
       const first = countUntil(starts, canvas.range.from);
       if (end - first > canvas.width / roomForClicks) return drawDensity(canvas, starts, canvas.palette.accent);
-      for (let i = Math.max(0, first - 4); i < end; ) {
+      for (let i = Math.max(0, first - 4); i < end;) {
         drawClick(canvas, clicks[i]!);
         i = Math.max(i + 1, countBefore(starts, canvas.time(canvas.x(starts[i]!) + 1.5)));
       }
@@ -145,7 +154,12 @@ function clickLane({ clicks }: Session): Lane | undefined {
 }
 
 function drawClick(canvas: LaneCanvas, click: Click): void {
-  const { context, top, height, palette: { accent, second } } = canvas;
+  const {
+    context,
+    top,
+    height,
+    palette: { accent, second },
+  } = canvas;
   const [x, right] = [canvas.x(click.start), canvas.x(click.end)];
   const middle = top + height / 2;
   context.fillStyle = click.button === 'left' ? accent : second;
@@ -164,30 +178,38 @@ const roomForKeys = 12; // pixels to a key, from which on each shows what it is
 
 function keyLane(session: Session, { showsKeys }: LaneOptions): Lane | undefined {
   const track = filled(session, 'keyboardAction');
-  return track && {
-    title: 'Keys',
-    height: 23,
-    draw: (canvas) => {
-      const first = countBefore(track.times, canvas.range.from);
-      const end = countBefore(track.times, canvas.range.to);
-      if (end - first <= canvas.width / roomForKeys) drawKeys(canvas, track, first, end, showsKeys());
-      else drawDensity(canvas, track.times, canvas.palette.accent);
-    },
-    valueAt: (time) => {
-      const index = track.at(time);
-      return index >= 0 && time - track.times[index]! < 1 ? keyLabel(track, index, showsKeys()).text : '';
-    },
-  };
+  return (
+    track && {
+      title: 'Keys',
+      height: 23,
+      draw: (canvas) => {
+        const first = countBefore(track.times, canvas.range.from);
+        const end = countBefore(track.times, canvas.range.to);
+        if (end - first <= canvas.width / roomForKeys) drawKeys(canvas, track, first, end, showsKeys());
+        else drawDensity(canvas, track.times, canvas.palette.accent);
+      },
+      valueAt: (time) => {
+        const index = track.at(time);
+        return index >= 0 && time - track.times[index]! < 1 ? keyLabel(track, index, showsKeys()).text : '';
+      },
+    }
+  );
 }
 
 function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number, showsKeys: boolean): void {
-  const { context, palette: { accent, accentSoft, text } } = canvas;
+  const {
+    context,
+    palette: { accent, accentSoft, text },
+  } = canvas;
   context.font = `600 11px ${canvas.palette.font}`;
   context.textBaseline = 'middle';
   for (let i = first; i < end; ++i) {
     const x = canvas.x(track.times[i]!);
     const room = (i + 1 < end ? canvas.x(track.times[i + 1]!) : Infinity) - x;
-    const label = keyLabel(track, i, showsKeys).text.replace(/\[(.*)\]$/, '$1').trim() || '␣';
+    const label =
+      keyLabel(track, i, showsKeys)
+        .text.replace(/\[(.*)\]$/, '$1')
+        .trim() || '␣';
     const width = Math.max(9, context.measureText(label).width + 6);
     context.fillStyle = accent;
     context.fillRect(x - 0.75, canvas.top + 4, 1.5, canvas.height - 8);
@@ -230,13 +252,21 @@ function scrollLane(session: Session): Lane | undefined {
       const index = track.at(time);
       if (index < 0 || time - track.times[index]! > 0.5) return '';
       const [x, y] = [track.number('x', index), track.number('y', index)];
-      return [x && `${x > 0 ? '→' : '←'} ${Math.abs(x)}`, y && `${y > 0 ? '↑' : '↓'} ${Math.abs(y)}`].filter(Boolean).join('  ');
+      return [x && `${x > 0 ? '→' : '←'} ${Math.abs(x)}`, y && `${y > 0 ? '↑' : '↓'} ${Math.abs(y)}`]
+        .filter(Boolean)
+        .join('  ');
     },
   };
 }
 
 function drawScroll(canvas: LaneCanvas, times: Float64Array, extremes: Extremes, most: number): void {
-  const { context, range, top, height, palette: { grid, third } } = canvas;
+  const {
+    context,
+    range,
+    top,
+    height,
+    palette: { grid, third },
+  } = canvas;
   const middle = top + height / 2;
   context.fillStyle = grid;
   context.fillRect(0, middle - 0.5, canvas.width, 1);
@@ -245,7 +275,9 @@ function drawScroll(canvas: LaneCanvas, times: Float64Array, extremes: Extremes,
   for (let x = 0; x < canvas.width; x += 2) {
     const end = countBefore(times, canvas.time(x + 2));
     if (end > first) {
-      const [least, greatest] = extremes.of(first, end).map((value) => Math.sign(value) * Math.min(1, Math.abs(value) / most)) as [number, number];
+      const [least, greatest] = extremes
+        .of(first, end)
+        .map((value) => Math.sign(value) * Math.min(1, Math.abs(value) / most)) as [number, number];
       const up = (Math.max(0, greatest) * (height - 6)) / 2;
       const down = (Math.max(0, -least) * (height - 6)) / 2;
       context.fillRect(x, middle - up, 1.6, up + down);
@@ -278,8 +310,18 @@ function trailLane(session: Session): Lane | undefined {
   const track = filled(session, 'cursorLocation');
   if (!track) return undefined;
   const region = session.region ?? { x: 0, y: 0, width: 1920, height: 1080 };
-  const x = curveOf(track, valuesOf(track, (i) => track.number('x', i)), region.x, region.x + region.width);
-  const y = curveOf(track, valuesOf(track, (i) => -track.number('y', i)), -(region.y + region.height), -region.y);
+  const x = curveOf(
+    track,
+    valuesOf(track, (i) => track.number('x', i)),
+    region.x,
+    region.x + region.width,
+  );
+  const y = curveOf(
+    track,
+    valuesOf(track, (i) => -track.number('y', i)),
+    -(region.y + region.height),
+    -region.y,
+  );
   return {
     title: 'Cursor x, y',
     height: 32,
@@ -331,7 +373,12 @@ function hoverLane(session: Session): Lane | undefined {
 function opacityLane(session: Session): Lane | undefined {
   const track = filled(session, 'cursorOpacity');
   if (!track) return undefined;
-  const curve = curveOf(track, valuesOf(track, (i) => track.number('opacity', i)), 0, 1);
+  const curve = curveOf(
+    track,
+    valuesOf(track, (i) => track.number('opacity', i)),
+    0,
+    1,
+  );
   return {
     title: 'Opacity',
     height: 20,
@@ -357,4 +404,3 @@ function cpuLane(session: Session): Lane | undefined {
     },
   };
 }
-

@@ -15,7 +15,11 @@ const grip = 7; // pixels beside an edge that still hold it
 type Hold = 'from' | 'to' | 'window';
 
 export class Overview {
-  readonly element = make('div', { class: 'overview', 'aria-hidden': 'true', title: 'Drag to choose what the lanes show' });
+  readonly element = make('div', {
+    class: 'overview',
+    'aria-hidden': 'true',
+    title: 'Drag to choose what the lanes show',
+  });
   private readonly canvas = make('canvas');
   private readonly window = make('div', { class: 'overview-window' });
   private readonly playhead = make('div', { class: 'overview-playhead' });
@@ -83,7 +87,9 @@ export class Overview {
         hold = Math.abs(x - xOf(from)) < grip ? 'from' : Math.abs(x - xOf(to)) < grip ? 'to' : 'window';
         const isOutside = hold === 'window' && (timeOf(x) < from || timeOf(x) > to);
         const half = (to - from) / 2;
-        started = isOutside ? clampedRange({ from: timeOf(x) - half, to: timeOf(x) + half }, this.duration) : this.range;
+        started = isOutside
+          ? clampedRange({ from: timeOf(x) - half, to: timeOf(x) + half }, this.duration)
+          : this.range;
         if (isOutside) this.onRange(started);
       },
       move: (_, way) => {

@@ -49,7 +49,10 @@ export class Timeline {
   constructor(private readonly events: TimelineEvents) {
     this.overview = new Overview((range) => this.setRange(range));
     this.build();
-    dragging(this.ruler, { start: (x) => this.events.onSeek(this.timeAt(x)), move: (x) => this.events.onSeek(this.timeAt(x)) });
+    dragging(this.ruler, {
+      start: (x) => this.events.onSeek(this.timeAt(x)),
+      move: (x) => this.events.onSeek(this.timeAt(x)),
+    });
     this.setUpLanes();
     new ResizeObserver(() => this.invalidate()).observe(this.body);
   }
@@ -57,7 +60,12 @@ export class Timeline {
   private build(): void {
     const root = byId('timeline');
     const tool = (icon: string, name: string, action: () => void) => {
-      const button = make('button', { type: 'button', class: 'button is-icon is-small', 'aria-label': name, title: name });
+      const button = make('button', {
+        type: 'button',
+        class: 'button is-icon is-small',
+        'aria-label': name,
+        title: name,
+      });
       setIcon(button, icon);
       button.addEventListener('click', action);
       return button;
@@ -72,7 +80,12 @@ export class Timeline {
     );
     this.ruler.append(this.rulerCanvas);
     this.body.append(this.lanesCanvas);
-    const scroll = make('div', { class: 'lanes-scroll', tabindex: 0, role: 'group', 'aria-label': 'Lanes' }, this.labels, this.body);
+    const scroll = make(
+      'div',
+      { class: 'lanes-scroll', tabindex: 0, role: 'group', 'aria-label': 'Lanes' },
+      this.labels,
+      this.body,
+    );
     root.append(
       make('div', { class: 'timeline-row' }, tools, this.overview.element),
       make('div', { class: 'timeline-row' }, make('div', { class: 'ruler-label' }, 'Time'), this.ruler),
@@ -89,7 +102,12 @@ export class Timeline {
     this.values = this.lanes.map(() => make('span', { class: 'lane-value' }));
     this.labels.replaceChildren(
       ...this.lanes.map(({ title, height }, i) => {
-        const label = make('div', { class: 'lane-label' }, make('span', { class: 'lane-title' }, title), this.values[i]!);
+        const label = make(
+          'div',
+          { class: 'lane-label' },
+          make('span', { class: 'lane-title' }, title),
+          this.values[i]!,
+        );
         label.style.height = `${(height + laneGap) / 16}rem`;
         return label;
       }),
@@ -114,7 +132,10 @@ export class Timeline {
     this.isStale = true;
     this.shownTime = -1;
     const length = this.range.to - this.range.from;
-    setText(this.zoomText, length >= this.duration ? 'all' : length >= 10 ? clock(length, 0) : `${length.toFixed(2)} s`);
+    setText(
+      this.zoomText,
+      length >= this.duration ? 'all' : length >= 10 ? clock(length, 0) : `${length.toFixed(2)} s`,
+    );
     this.events.onRange(this.range);
   }
 
@@ -200,9 +221,11 @@ export class Timeline {
     const { context, width, height, range } = canvas;
     context.fillStyle = palette().idle;
     for (const { start, end } of this.session?.idle ?? [])
-      if (end > range.from && start < range.to) context.fillRect(canvas.x(start), 0, canvas.x(end) - canvas.x(start), height);
+      if (end > range.from && start < range.to)
+        context.fillRect(canvas.x(start), 0, canvas.x(end) - canvas.x(start), height);
     context.fillStyle = palette().grid;
-    for (const time of ticks(range, tickStep(range, width, 84))) context.fillRect(Math.round(canvas.x(time)), 0, 1, height);
+    for (const time of ticks(range, tickStep(range, width, 84)))
+      context.fillRect(Math.round(canvas.x(time)), 0, 1, height);
   }
 
   private drawRuler(scale: number): void {
@@ -269,7 +292,8 @@ export class Timeline {
 
   /// What the lane under the pointer tells at that time.
   private point(event: PointerEvent): void {
-    if (event.pointerType === 'touch' || event.buttons !== 0) return void (this.pointerLine.hidden = this.tip.hidden = true);
+    if (event.pointerType === 'touch' || event.buttons !== 0)
+      return void (this.pointerLine.hidden = this.tip.hidden = true);
     const box = this.body.getBoundingClientRect();
     const x = event.clientX - box.left;
     const y = (event.clientY - box.top) / uiScale();
@@ -279,7 +303,11 @@ export class Timeline {
     this.pointerLine.hidden = this.tip.hidden = false;
     this.pointerLine.style.transform = `translateX(${x}px)`;
     const value = lane?.valueAt(time);
-    this.tip.replaceChildren(make('b', {}, clock(time)), ...(lane ? [` ${lane.title}`] : []), ...(value ? [make('i', {}, value)] : []));
+    this.tip.replaceChildren(
+      make('b', {}, clock(time)),
+      ...(lane ? [` ${lane.title}`] : []),
+      ...(value ? [make('i', {}, value)] : []),
+    );
     const root = byId('timeline').getBoundingClientRect();
     const left = Math.min(event.clientX - root.left + 12, root.width - this.tip.offsetWidth - 8);
     this.tip.style.transform = `translate(${Math.max(4, left)}px, ${event.clientY - root.top - this.tip.offsetHeight - 10}px)`;

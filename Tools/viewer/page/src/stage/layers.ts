@@ -88,7 +88,10 @@ function textAt({ session, time }: Scene, kind: string, column: string): string 
 
 function outline(context: Context, { accent, unit }: Scene, rect: Rect, width: number, dash: number[]): void {
   context.setLineDash(dash.map((length) => length * unit));
-  for (const [colour, extra] of [[shade, 1.5], [accent, 0]] as const) {
+  for (const [colour, extra] of [
+    [shade, 1.5],
+    [accent, 0],
+  ] as const) {
     context.strokeStyle = colour;
     context.lineWidth = (width + extra) * unit;
     context.strokeRect(rect.x, rect.y, rect.width, rect.height);
@@ -203,7 +206,10 @@ function disc(context: Context, centre: Point, radius: number, colour: string, a
 
 function ring(context: Context, centre: Point, radius: number, width: number, colour: string, alpha: number): void {
   context.globalAlpha = Math.max(0, alpha);
-  for (const [style, extra] of [[shade, 1.6], [colour, 1]] as const) {
+  for (const [style, extra] of [
+    [shade, 1.6],
+    [colour, 1],
+  ] as const) {
     context.strokeStyle = style;
     context.lineWidth = width * extra;
     context.beginPath();
@@ -243,7 +249,15 @@ export function drawCursor(context: Context, scene: Scene): void {
   context.globalAlpha = 1;
 }
 
-const arrow: [number, number][] = [[0, 0], [0, 17], [4, 13.4], [6.6, 19.4], [9.2, 18.3], [6.7, 12.5], [12, 12.2]];
+const arrow: [number, number][] = [
+  [0, 0],
+  [0, 17],
+  [4, 13.4],
+  [6.6, 19.4],
+  [9.2, 18.3],
+  [6.7, 12.5],
+  [12, 12.2],
+];
 
 /// Stands for a cursor whose image is not known.
 function drawArrow(context: Context, { placement }: Scene, tip: Point): void {

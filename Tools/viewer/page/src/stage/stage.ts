@@ -58,7 +58,10 @@ export class Stage {
     const size: Size | undefined =
       movie === 'ready' ? { width: video.videoWidth, height: video.videoHeight } : undefined;
     this.placement = placementOf(this.session.region, this.session.scaleFactor, size);
-    const place = fitted(this.placement.frame, { width: this.element.clientWidth, height: this.element.clientHeight });
+    const place = fitted(this.placement.frame, {
+      width: this.element.clientWidth,
+      height: this.element.clientHeight,
+    });
     Object.assign(this.frame.style, {
       left: `${place.x}px`,
       top: `${place.y}px`,

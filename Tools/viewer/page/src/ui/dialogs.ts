@@ -27,17 +27,24 @@ const gestures: [string, string][] = [
 ];
 
 function rows(entries: [string, string][]): HTMLElement {
-  return make('dl', { class: 'keys' }, ...entries.flatMap(([key, text]) => [
-    make('dt', {}, ...key.split(' ').map((part) => (part === '–' ? part : make('kbd', {}, part)))),
-    make('dd', {}, text),
-  ]));
+  return make(
+    'dl',
+    { class: 'keys' },
+    ...entries.flatMap(([key, text]) => [
+      make('dt', {}, ...key.split(' ').map((part) => (part === '–' ? part : make('kbd', {}, part)))),
+      make('dd', {}, text),
+    ]),
+  );
 }
 
 function fill(dialog: HTMLDialogElement, id: string, title: string, ...content: Node[]): void {
   const close = make('button', { type: 'button', class: 'button is-icon', 'aria-label': 'Close' });
   setIcon(close, 'close');
   close.addEventListener('click', () => dialog.close());
-  dialog.replaceChildren(make('div', { class: 'dialog-head' }, make('h2', { id }, title), close), make('div', { class: 'dialog-body' }, ...content));
+  dialog.replaceChildren(
+    make('div', { class: 'dialog-head' }, make('h2', { id }, title), close),
+    make('div', { class: 'dialog-body' }, ...content),
+  );
   dialog.addEventListener('click', (event) => {
     if (event.target === dialog) dialog.close(); // beside it
   });
@@ -45,11 +52,33 @@ function fill(dialog: HTMLDialogElement, id: string, title: string, ...content: 
 
 function aboutContent(): Node[] {
   return [
-    make('p', {}, 'Shows what was recorded beside a movie: read by the ZULMetaData library itself, compiled to WebAssembly and held inside this page.'),
-    make('p', {}, 'The page works without a network. Its security policy forbids every connection: recordings stay on this computer.'),
+    make(
+      'p',
+      {},
+      'Shows what was recorded beside a movie: read by the ZULMetaData library itself, compiled to WebAssembly and held inside this page.',
+    ),
+    make(
+      'p',
+      {},
+      'The page works without a network. Its security policy forbids every connection: recordings stay on this computer.',
+    ),
     make('h3', {}, 'What is inside'),
-    make('ul', { class: 'licences' }, ...licences.map(({ name, licence, text }) =>
-      make('li', {}, make('details', {}, make('summary', {}, make('b', {}, name), ` ${licence}`), make('pre', { tabindex: 0 }, text))))),
+    make(
+      'ul',
+      { class: 'licences' },
+      ...licences.map(({ name, licence, text }) =>
+        make(
+          'li',
+          {},
+          make(
+            'details',
+            {},
+            make('summary', {}, make('b', {}, name), ` ${licence}`),
+            make('pre', { tabindex: 0 }, text),
+          ),
+        ),
+      ),
+    ),
   ];
 }
 
@@ -60,10 +89,22 @@ The above copyright notice and this permission notice shall be included in all c
 THE SOFTWARE IS PROVIDED "AS IS", WITHOUT WARRANTY OF ANY KIND, EXPRESS OR IMPLIED, INCLUDING BUT NOT LIMITED TO THE WARRANTIES OF MERCHANTABILITY, FITNESS FOR A PARTICULAR PURPOSE AND NONINFRINGEMENT. IN NO EVENT SHALL THE AUTHORS OR COPYRIGHT HOLDERS BE LIABLE FOR ANY CLAIM, DAMAGES OR OTHER LIABILITY, WHETHER IN AN ACTION OF CONTRACT, TORT OR OTHERWISE, ARISING FROM, OUT OF OR IN CONNECTION WITH THE SOFTWARE OR THE USE OR OTHER DEALINGS IN THE SOFTWARE.`;
 
 const licences = [
-  { name: 'ZULMetaData', licence: 'all rights reserved', text: 'No licence has been chosen yet: all rights stay with the owner.' },
+  {
+    name: 'ZULMetaData',
+    licence: 'all rights reserved',
+    text: 'No licence has been chosen yet: all rights stay with the owner.',
+  },
   { name: 'JSON for Modern C++', licence: 'MIT', text: `Copyright (c) 2013-2022 Niels Lohmann\n\n${mitText}` },
-  { name: '{fmt}', licence: 'MIT, with an exception for object form', text: `Copyright (c) 2012 - present, Victor Zverovich and {fmt} contributors\n\n${mitText}\n\n--- Optional exception to the license ---\n\nAs an exception, if, as a result of your compiling your source code, portions of this Software are embedded into a machine-executable object form of such source code, you may redistribute such embedded portions in such object form without including the above copyright and permission notices.` },
-  { name: 'Emscripten runtime, musl and LLVM libc++', licence: 'MIT; Apache 2.0 with LLVM exceptions', text: `Copyright (c) 2010-2022 Emscripten authors\nCopyright (c) 2005-2020 Rich Felker, et al. (musl)\nCopyright (c) 2009-2022 the LLVM contributors (libc++, libc++abi; Apache License 2.0 with LLVM Exceptions, or MIT)\n\n${mitText}` },
+  {
+    name: '{fmt}',
+    licence: 'MIT, with an exception for object form',
+    text: `Copyright (c) 2012 - present, Victor Zverovich and {fmt} contributors\n\n${mitText}\n\n--- Optional exception to the license ---\n\nAs an exception, if, as a result of your compiling your source code, portions of this Software are embedded into a machine-executable object form of such source code, you may redistribute such embedded portions in such object form without including the above copyright and permission notices.`,
+  },
+  {
+    name: 'Emscripten runtime, musl and LLVM libc++',
+    licence: 'MIT; Apache 2.0 with LLVM exceptions',
+    text: `Copyright (c) 2010-2022 Emscripten authors\nCopyright (c) 2005-2020 Rich Felker, et al. (musl)\nCopyright (c) 2009-2022 the LLVM contributors (libc++, libc++abi; Apache License 2.0 with LLVM Exceptions, or MIT)\n\n${mitText}`,
+  },
 ];
 
 export function setUpDialogs(): void {
@@ -91,8 +132,13 @@ export function ask(title: string, text: string, yes: string): Promise<boolean> 
       });
       return element;
     };
-    fill(dialog, 'confirm-title', title, make('p', {}, text),
-      make('div', { class: 'dialog-actions' }, button('Cancel', false, ''), button(yes, true, 'is-primary')));
+    fill(
+      dialog,
+      'confirm-title',
+      title,
+      make('p', {}, text),
+      make('div', { class: 'dialog-actions' }, button('Cancel', false, ''), button(yes, true, 'is-primary')),
+    );
     dialog.addEventListener('close', () => done(false), { once: true });
     dialog.showModal();
   });

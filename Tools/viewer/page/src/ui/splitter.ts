@@ -7,7 +7,13 @@ interface Limits {
   most: () => number;
 }
 
-function setUpSplitter(id: string, property: string, isVertical: boolean, sizeOf: () => number, { least, most }: Limits): void {
+function setUpSplitter(
+  id: string,
+  property: string,
+  isVertical: boolean,
+  sizeOf: () => number,
+  { least, most }: Limits,
+): void {
   const splitter = byId(id);
   const set = (size: number) => {
     const value = Math.round(Math.max(least, Math.min(size, most())));
@@ -41,5 +47,8 @@ export function setUpSplitters(): void {
   const side = () => document.querySelector('.side')!.getBoundingClientRect().width;
   const lanes = () => byId('timeline').getBoundingClientRect().height;
   setUpSplitter('side-splitter', '--side-width', true, side, { least: 240, most: () => window.innerWidth * 0.6 });
-  setUpSplitter('lanes-splitter', '--lanes-height', false, lanes, { least: 120, most: () => window.innerHeight * 0.7 });
+  setUpSplitter('lanes-splitter', '--lanes-height', false, lanes, {
+    least: 120,
+    most: () => window.innerHeight * 0.7,
+  });
 }
