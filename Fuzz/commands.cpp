@@ -7,6 +7,7 @@
 #include <array>
 #include <filesystem>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace {
@@ -15,7 +16,7 @@ using Words = std::vector<std::string>;
 
 constexpr std::array s_extensions{".mp4", ".avi", ".dat", ".mov"};
 
-/// FILE is the input, DIR a folder, and MOVIE a small movie that is whole.
+/// FILE is the input, DIR a folder, MOVIE a small movie that is whole, and PAGE a page without anything.
 const std::vector<Words> s_commands{
     {"info", "FILE"},
     {"info", "--json", "FILE"},
@@ -45,6 +46,8 @@ const std::vector<Words> s_commands{
     {"convert", "--to", "ass", "FILE"},
     {"convert", "--to", "ffmetadata", "FILE"},
     {"convert", "--to", "chapters", "FILE"},
+    {"view", "FILE", "-o", "DIR/out.html", "--force", "--page", "PAGE"},
+    {"view", "FILE", "-o", "DIR/out.html", "--force", "--page", "PAGE", "--embed"},
 };
 
 std::string replaced(std::string word, const std::string& name, const std::string& value) {
@@ -67,11 +70,15 @@ void runTarget(std::string_view bytes) {
     const std::string extension = s_extensions[Fuzz::takeByte(bytes) % s_extensions.size()];
     const std::string file = Fuzz::fileOf("file" + extension, bytes);
     const std::string movie = Fuzz::fileOf("movie.mp4", std::string_view("\0\0\0\x08mdat", 8));
+    const std::string page = Fuzz::fileOf("page.html", "<head></head>");
+    const std::pair<std::string, std::string> names[] = {
+        {"FILE", file}, {"DIR", Fuzz::folder()}, {"MOVIE", movie}, {"EXTENSION", extension}, {"PAGE", page}};
     Words words{"zulm"};
-    for (const std::string& word : command)
-        words.push_back(
-            replaced(replaced(replaced(replaced(word, "FILE", file), "DIR", Fuzz::folder()), "MOVIE", movie),
-                     "EXTENSION", extension));
+    for (std::string word : command) {
+        for (const auto& [name, value] : names)
+            word = replaced(std::move(word), name, value);
+        words.push_back(std::move(word));
+    }
     const int code = runCommand(words);
     if (code != Zulm::ExitFine && code != Zulm::ExitFailed && code != Zulm::ExitDamaged && code != Zulm::ExitNoMetaData)
         Fuzz::fail("an exit code that this command line cannot have");

@@ -42,8 +42,8 @@ TEST_F(CommandLine, HelpGroupsTheCommandsAndEndsWellOnStandardOutput) {
 }
 
 TEST_F(CommandLine, HelpOfEveryCommandHasItsUsageAndAnExample) {
-    for (const std::string command : {"info", "atoms", "dump", "diff", "grep", "verify", "repair", "salvage", "attach",
-                                      "stamp", "redact", "extract", "convert", "demo"}) {
+    for (const std::string command : {"info", "atoms", "dump", "diff", "grep", "view", "verify", "repair", "salvage",
+                                      "attach", "stamp", "redact", "extract", "convert", "demo"}) {
         const ToolResult result = runTool({command, "--help"});
         EXPECT_EQ(result.exitCode, 0);
         EXPECT_THAT(result.output, HasSubstr("\nUsage: zulm " + command + " [OPTIONS]"));
