@@ -1,16 +1,16 @@
 # The viewer's page: its own tests, and tests of it in a browser.
-add_executable(long_recording Tools/viewer/LongRecording.cpp)
-target_link_libraries(long_recording PRIVATE zulm_demo ZULMetaData::Bridge)
-zulm_project_options(long_recording)
-
 find_program(CHROMIUM NAMES chromium chromium-browser)
 if(ZULM_VIEWER)
-  add_test(NAME viewer/page COMMAND ${NPM} test --silent 
+  add_test(NAME viewer/page COMMAND ${NPM} test --silent
     WORKING_DIRECTORY ${PROJECT_BINARY_DIR}/Tools/viewer/build/Tools/viewer/page)
   set_tests_properties(viewer/page PROPERTIES TIMEOUT 300)
 endif()
 
 if(ZULM_VIEWER AND CHROMIUM)
+  add_executable(long_recording Tools/viewer/LongRecording.cpp)
+  target_link_libraries(long_recording PRIVATE zulm_demo ZULMetaData::Bridge)
+  zulm_project_options(long_recording)
+
   set(viewer_tests ${CMAKE_CURRENT_SOURCE_DIR}/Tools/viewer)
   set(viewer_packages ${CMAKE_CURRENT_BINARY_DIR}/Tools/viewer)
   add_custom_command(
