@@ -4,6 +4,8 @@
 // back. Everything happens in memory. What a codec cannot read or write is "no image", without a message; only
 // std::bad_alloc, for pixels that memory has no room for, leaves these functions as an exception.
 
+#include "SharedDependencies/Export.h"
+
 #include <cstdint>
 #include <optional>
 #include <span>
@@ -18,7 +20,7 @@ struct EncodedImageInfo {
     std::uint64_t decodingMemory; ///< bytes that decoding asks for at most, beside the encoded ones
 };
 
-class Image {
+class ZULMETADATA_API Image {
 public:
     /// `rgba` holds width * height pixels of four bytes (red, green, blue, straight alpha), rows from the top without
     /// padding. Any other amount is kept as it is; such an image cannot be encoded, and neither can one with a side
@@ -49,7 +51,7 @@ private:
 };
 
 /// The pixels of a TIFF file, ready to be encoded again.
-class BitmapImageRep {
+class ZULMETADATA_API BitmapImageRep {
 public:
     /// Takes TIFF data only, under the conditions of Image::fromEncodedBytes.
     static std::optional<BitmapImageRep> fromTIFF(std::span<const std::uint8_t> tiff);

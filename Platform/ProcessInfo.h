@@ -2,12 +2,14 @@
 
 // The machine and the operating system that this process runs on.
 
+#include "SharedDependencies/Export.h"
+
 #include <cstdint>
 #include <string>
 
 namespace ZULMetaData {
 
-struct ProcessInfo {
+struct ZULMETADATA_API ProcessInfo {
     /// Processors that the machine has; never 0.
     std::uint64_t processorCount = 1;
     /// Processors that are switched on; at least 1, at most processorCount.

@@ -2,6 +2,8 @@
 
 // Who made a recording: the 56-byte creator record of a movie's recording info.
 
+#include "SharedDependencies/Export.h"
+
 #include <cstddef>
 #include <string>
 #include <type_traits>
@@ -11,7 +13,7 @@ namespace ZULMetaData {
 /// Three texts in fixed fields, written to disk as they lie in memory: name (24 bytes), version (16) and
 /// platform version (16). Each is UTF-8 and always ends with a zero byte; a text too long for its field is cut
 /// behind its last whole character.
-class CreatorAttributes {
+class ZULMETADATA_API CreatorAttributes {
 public:
     void setName(const std::string& name);
     void setVersion(const std::string& version);

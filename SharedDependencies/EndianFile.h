@@ -3,6 +3,8 @@
 // Opening files the way the whole library does, and the byte order and position
 // helpers that its containers need.
 
+#include "SharedDependencies/Export.h"
+
 #include <cstdint>
 #include <fstream>
 #include <ios>
@@ -13,19 +15,19 @@ namespace ZULMetaData {
 // A pipe cannot be opened, whatever waits at its other end: no opening ever hangs. `errno` says why one failed.
 
 /// Opens `path` with `mode` plus the input mode. Sets the fail bit where it cannot; otherwise clears the state.
-void fileOpen(std::ifstream& stream, const char* path, std::ios_base::openmode mode);
+ZULMETADATA_API void fileOpen(std::ifstream& stream, const char* path, std::ios_base::openmode mode);
 
 /// Opens `path` with `mode` plus the output mode. Sets the fail bit where it cannot; otherwise clears the state.
-void fileOpen(std::ofstream& stream, const char* path, std::ios_base::openmode mode);
+ZULMETADATA_API void fileOpen(std::ofstream& stream, const char* path, std::ios_base::openmode mode);
 
 /// Opens `path` with `mode` as given. Sets the fail bit where it cannot; otherwise clears the state.
-void fileOpen(std::fstream& stream, const char* path, std::ios_base::openmode mode);
+ZULMETADATA_API void fileOpen(std::fstream& stream, const char* path, std::ios_base::openmode mode);
 
 /// Moves the write position to `position` bytes from the start. A failed seek sets the fail bit.
-void seekWritePos(std::ostream& stream, std::int64_t position);
+ZULMETADATA_API void seekWritePos(std::ostream& stream, std::int64_t position);
 
 /// -1 for the position of a stream that has failed.
-std::int64_t toInt64(std::streampos position);
+ZULMETADATA_API std::int64_t toInt64(std::streampos position);
 
 /// Reverses the byte order: between the host's and that of a movie's atoms, in both directions.
 constexpr std::uint64_t swapInt(std::uint64_t value) {

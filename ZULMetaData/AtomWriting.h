@@ -3,6 +3,8 @@
 // Appending one atom to a movie: its header with a size of 0, the payload, and last the real size. The header is
 // always in extended form.
 
+#include "SharedDependencies/Export.h"
+
 #include <cstdint>
 #include <fstream>
 
@@ -15,12 +17,12 @@ struct OpenAtom {
 };
 
 /// Writes the header at the end of `movie`.
-OpenAtom beginAtom(std::ofstream& movie, std::uint32_t type);
+ZULMETADATA_API OpenAtom beginAtom(std::ofstream& movie, std::uint32_t type);
 
 /// Closes `movie` and gives the length of the atom, counted from an end of -1 where a write has failed.
-std::uint64_t endAtom(std::ofstream& movie, const OpenAtom& atom);
+ZULMETADATA_API std::uint64_t endAtom(std::ofstream& movie, const OpenAtom& atom);
 
 /// Writes the extended size of an atom; silent where it cannot.
-void writeAtomSize(std::fstream& movie, std::int64_t sizeField, std::uint64_t size);
+ZULMETADATA_API void writeAtomSize(std::fstream& movie, std::int64_t sizeField, std::uint64_t size);
 
 } // namespace ZULMetaData::detail

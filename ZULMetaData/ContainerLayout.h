@@ -3,6 +3,7 @@
 // The atoms of a movie or the chunks of a RIFF file as their headers declare them, for tools that show or check a
 // container. Nothing between the headers is read.
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <cstdint>
@@ -13,7 +14,7 @@
 
 namespace ZULMetaData {
 
-struct ContainerItem {
+struct ZULMETADATA_API ContainerItem {
     std::string type;         ///< four characters as they are stored, whatever bytes they are
     std::uint64_t offset;     ///< where the header begins
     std::uint64_t headerSize; ///< 8, or 16 for an atom in extended form
@@ -42,17 +43,19 @@ using ContainerVisitor = std::function<bool(const ContainerItem&)>;
 /// The items between `begin` and `end` of `stream`, which holds `total` bytes. Ends with the first item that nothing
 /// can follow: one with an open end, one whose end no file position can hold, or one that reaches beyond the total.
 /// All of these clear the stream's state first.
-void visitAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
-                const ContainerVisitor& visit);
-void visitChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
-                 const ContainerVisitor& visit);
-std::vector<ContainerItem> listAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total);
-std::vector<ContainerItem> listChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end,
-                                      std::uint64_t total);
+ZULMETADATA_API void visitAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
+                                const ContainerVisitor& visit);
+ZULMETADATA_API void visitChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
+                                 const ContainerVisitor& visit);
+ZULMETADATA_API std::vector<ContainerItem> listAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end,
+                                                     std::uint64_t total);
+ZULMETADATA_API std::vector<ContainerItem> listChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end,
+                                                      std::uint64_t total);
 
 /// The items at the top of a container; none where `type` is a bare stream or unknown. A movie may hold hundreds of
 /// thousands: visiting them keeps none.
-void visitTopLevel(std::istream& stream, MetaDataParser::StreamType type, const ContainerVisitor& visit);
-std::vector<ContainerItem> listTopLevel(std::istream& stream, MetaDataParser::StreamType type);
+ZULMETADATA_API void visitTopLevel(std::istream& stream, MetaDataParser::StreamType type,
+                                   const ContainerVisitor& visit);
+ZULMETADATA_API std::vector<ContainerItem> listTopLevel(std::istream& stream, MetaDataParser::StreamType type);
 
 } // namespace ZULMetaData

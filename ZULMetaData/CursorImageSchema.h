@@ -4,6 +4,7 @@
 // part. A step says for which stream versions its field exists, when it is present, and where its bytes lie in
 // memory. A later version appends steps; older readers skip what they do not know.
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 
 #include <cstdint>
@@ -40,7 +41,7 @@ struct SchemaFieldStep {
 };
 
 /// The steps are constants, so a schema costs nothing to build and its lists outlive it.
-class CursorImageSchema {
+class ZULMETADATA_API CursorImageSchema {
 public:
     using Steps = std::span<const SchemaFieldStep>;
 

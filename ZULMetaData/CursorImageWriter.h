@@ -6,6 +6,7 @@
 //     4   timestamp                 24  imageSizeV2 = n             36      imageData
 //     12  cursorID                  28  hotspotX                    36 + n  cursorType, 40 + n cursorFlags
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/CursorImageSchema.h"
 
 #include <cstdint>
@@ -14,7 +15,7 @@
 namespace ZULMetaData {
 
 /// Made for one entry. Never looks at the state of the stream.
-class CursorImageWriter {
+class ZULMETADATA_API CursorImageWriter {
 public:
     explicit CursorImageWriter(int version) : version_(version) {}
 
@@ -34,7 +35,7 @@ private:
 };
 
 /// Made for one entry.
-class CursorImageReader {
+class ZULMETADATA_API CursorImageReader {
 public:
     explicit CursorImageReader(int version) : version_(version) {}
 
@@ -71,10 +72,10 @@ void metaDataWriteWithSchema(Schema& schema, R& record, std::ostream& stream, in
 
 namespace detail {
 
-void writeCursorImageEntry(double time, const CursorImage& image, std::ostream& stream, int version);
+ZULMETADATA_API void writeCursorImageEntry(double time, const CursorImage& image, std::ostream& stream, int version);
 
 /// Gives the bytes that the entry took; meaningless where the input ended inside it.
-std::uint64_t readCursorImageEntry(std::istream& stream, double& time, CursorImage& image, int version);
+ZULMETADATA_API std::uint64_t readCursorImageEntry(std::istream& stream, double& time, CursorImage& image, int version);
 
 } // namespace detail
 

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <optional>
@@ -9,6 +10,6 @@ namespace ZULMetaData {
 /// How long a movie says it lasts, in seconds: what the header in its first `moov` atom declares. Nothing where it has
 /// none, as while it is still being recorded, where the header is cut short, counts in no timescale or leaves the
 /// duration open, and for any other container.
-std::optional<double> movieDuration(MetaDataParser& movie);
+ZULMETADATA_API std::optional<double> movieDuration(MetaDataParser& movie);
 
 } // namespace ZULMetaData

@@ -2,6 +2,7 @@
 
 // An input stream whose position is counted instead of asked for, bounded by the size of its file.
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/StreamBufferAccess.h"
 
 #include <cstddef>
@@ -12,7 +13,7 @@
 namespace ZULMetaData::detail {
 
 /// Uses a stream of the caller. Moving costs nothing; the stream follows when the next bytes are read.
-class PositionedInput {
+class ZULMETADATA_API PositionedInput {
 public:
     /// `position` is where the stream stands.
     PositionedInput(std::istream& stream, std::uint64_t position, std::uint64_t total)

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "SharedDependencies/Export.h"
 #include "SharedDependencies/ZCAPHeader.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
@@ -9,6 +10,6 @@ namespace ZULMetaData {
 
 /// Who made a movie: what its top-level `ZULR` atoms hold, in the order of the file. The last one was stamped last.
 /// One too short to hold the record is left out.
-std::vector<ZCAPHeader> readRecordingInfo(MetaDataParser& movie);
+ZULMETADATA_API std::vector<ZCAPHeader> readRecordingInfo(MetaDataParser& movie);
 
 } // namespace ZULMetaData

@@ -6,6 +6,8 @@
 // Mended are a last atom with an open end, an append that was interrupted, and a movie that
 // `Util::finalizeAtomsInFile` left 8 bytes short. Nothing is changed where two readings are possible.
 
+#include "SharedDependencies/Export.h"
+
 #include <cstdint>
 #include <istream>
 #include <string>
@@ -33,6 +35,6 @@ struct RepairPlan {
 
 /// Reads the headers of the movie's atoms, and the entries of a stream whose append was interrupted. Clears the
 /// stream's state first. Throws `std::system_error` where reading fails.
-RepairPlan planRepair(std::istream& movie);
+ZULMETADATA_API RepairPlan planRepair(std::istream& movie);
 
 } // namespace ZULMetaData

@@ -4,6 +4,8 @@
 // of `write` or `read` on a stream costs five to twenty times as much as the 16 bytes of an entry that it moves.
 // The streams stay usable by anybody in between, for the areas are always left as the buffer itself would leave them.
 
+#include "SharedDependencies/Export.h"
+
 #include <cstddef>
 #include <cstring>
 #include <istream>
@@ -66,7 +68,7 @@ inline char* placeFor(std::ostream& stream, std::size_t size) {
 }
 
 /// Fills the put area to its end before it is written out, so that blocks keep one size.
-void writeAcrossBlocks(std::ostream& stream, const char* bytes, std::size_t size);
+ZULMETADATA_API void writeAcrossBlocks(std::ostream& stream, const char* bytes, std::size_t size);
 
 /// As `stream.write`, at the cost of a copy where the put area has room.
 inline void writeBytes(std::ostream& stream, const char* bytes, std::size_t size) {

@@ -8,6 +8,7 @@
 //         if (const auto decoded = decodeEntry<std::string>(entries.bytesOf(*entry), entries.header()->version))
 //             std::cout << decoded->time << ' ' << decoded->value << '\n';
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/StreamExtent.h"
 #include "ZULMetaData/ZULMMetaDataReader.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
@@ -28,7 +29,7 @@ struct StreamEntry {
 };
 
 /// Walks forward once, reading large pieces; needs little memory but for the bytes of one entry.
-class StreamEntries {
+class ZULMETADATA_API StreamEntries {
 public:
     /// `read` gives the stream's bytes by their position behind its start; it holds `length` of them.
     StreamEntries(ReadBytes read, std::uint64_t length);
@@ -82,9 +83,9 @@ std::optional<TimedValue<T>> decodeEntry(std::string_view bytes, int version);
 
 namespace detail {
 
-bool readEntryBytes(std::string_view bytes, double& time, std::string& text);
-bool readEntryBytes(std::string_view bytes, double& time, std::list<std::string>& texts);
-bool readEntryBytes(std::string_view bytes, double& time, CursorImage& image, int version);
+ZULMETADATA_API bool readEntryBytes(std::string_view bytes, double& time, std::string& text);
+ZULMETADATA_API bool readEntryBytes(std::string_view bytes, double& time, std::list<std::string>& texts);
+ZULMETADATA_API bool readEntryBytes(std::string_view bytes, double& time, CursorImage& image, int version);
 
 } // namespace detail
 

@@ -3,6 +3,7 @@
 // How much of a metadata stream is whole: its header and the entries in front of the first one that is cut short.
 // Bounded by the bytes that are there, whatever sizes they declare, and in constant memory.
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
 
 #include <cstddef>
@@ -32,13 +33,14 @@ struct StreamExtent {
 using ReadBytes = std::function<std::size_t(std::uint64_t position, std::span<char> bytes)>;
 
 /// Walks the `length` bytes of a stream. None where they do not hold a stream's header.
-std::optional<StreamExtent> measureStream(const ReadBytes& read, std::uint64_t length);
+ZULMETADATA_API std::optional<StreamExtent> measureStream(const ReadBytes& read, std::uint64_t length);
 
 /// The same for `length` bytes from `offset` on. Clears the input's state first.
-std::optional<StreamExtent> measureStream(std::istream& input, std::uint64_t offset, std::uint64_t length);
+ZULMETADATA_API std::optional<StreamExtent> measureStream(std::istream& input, std::uint64_t offset,
+                                                          std::uint64_t length);
 
 /// What `input` holds, to be read at any position. Uses an input of the caller, which must outlive it. Throws
 /// `std::system_error` where reading fails.
-ReadBytes readingFrom(std::istream& input);
+ZULMETADATA_API ReadBytes readingFrom(std::istream& input);
 
 } // namespace ZULMetaData

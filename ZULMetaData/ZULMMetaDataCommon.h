@@ -4,6 +4,7 @@
 // The fixed-size values are stored as they lie in memory: the order and width of their fields is a file format.
 
 #include "SharedDependencies/EndianFile.h"
+#include "SharedDependencies/Export.h"
 
 #include <bit>
 #include <compare>
@@ -57,7 +58,7 @@ enum CursorTypeID : std::int32_t { CursorTypeUnknown = -1 };
 
 /// One appearance of the cursor: its image, or only the identifier of an image that came earlier.
 /// Owns `imageData`, which is allocated by `malloc`.
-class CursorImage {
+class ZULMETADATA_API CursorImage {
 public:
     /// The recorder's own bits, passed through; a plain image has the two lowest set.
     enum CursorImageFlags : std::uint32_t { DefaultFlags = 3 };
@@ -90,14 +91,14 @@ public:
     void freeImageData(bool freeBytes);
 
     /// The bytes take part only where both images have them.
-    friend bool operator==(const CursorImage& left, const CursorImage& right);
+    friend ZULMETADATA_API bool operator==(const CursorImage& left, const CursorImage& right);
 
 private:
     void copyAllButImage(const CursorImage& other);
 };
 
 /// 16 bytes in the order in which they are printed; no byte is ever swapped.
-struct uuid {
+struct ZULMETADATA_API uuid {
     std::uint8_t data[16];
 
     /// The value of the next two characters, read as `hexCharsToUint8` reads them.
@@ -111,17 +112,17 @@ struct uuid {
 };
 
 /// 8-4-4-4-12 lower-case digits. Leaves the stream printing numbers in hexadecimal, filled with zeros.
-std::ostream& operator<<(std::ostream& stream, const uuid& id);
+ZULMETADATA_API std::ostream& operator<<(std::ostream& stream, const uuid& id);
 
 /// Takes exactly 36 characters and checks none of them, the four separators included.
-std::istream& operator>>(std::istream& stream, uuid& id);
+ZULMETADATA_API std::istream& operator>>(std::istream& stream, uuid& id);
 
-std::ostream& operator<<(std::ostream& stream, const Point& point);
-std::ostream& operator<<(std::ostream& stream, const Rect& rect);
-std::ostream& operator<<(std::ostream& stream, const KeyStroke& keyStroke);
+ZULMETADATA_API std::ostream& operator<<(std::ostream& stream, const Point& point);
+ZULMETADATA_API std::ostream& operator<<(std::ostream& stream, const Rect& rect);
+ZULMETADATA_API std::ostream& operator<<(std::ostream& stream, const KeyStroke& keyStroke);
 
 /// Shows the address of the image bytes, as a signed number, instead of the bytes.
-std::ostream& operator<<(std::ostream& stream, const CursorImage& image);
+ZULMETADATA_API std::ostream& operator<<(std::ostream& stream, const CursorImage& image);
 
 template <class T, class... Types>
 concept OneOf = (std::same_as<T, Types> || ...);

@@ -5,6 +5,7 @@
 //     if (const auto parser = MetaDataParser::create("Recording.mp4"))
 //         parser->loadDataType<Point>(s_cursorLocationUUID, observer, -1);
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataReader.h"
 
 #include <cstdint>
@@ -18,7 +19,7 @@ namespace ZULMetaData {
 
 /// Scans its file once, when it is created, and then serves reads from the ranges that it found. Holds one stream
 /// position: calls must not overlap.
-class MetaDataParser {
+class ZULMETADATA_API MetaDataParser {
 public:
     enum StreamType : std::int32_t { Unknown, Riff, QuickTime, RawStream };
 
@@ -76,22 +77,24 @@ private:
 namespace ParserUtil {
 
 /// -1 for a stream that has failed. Keeps the position.
-std::int64_t calcFileSize(std::istream& stream);
+ZULMETADATA_API std::int64_t calcFileSize(std::istream& stream);
 
-bool enoughBytesLeft(std::istream& stream, std::uint64_t total, std::uint64_t needed);
+ZULMETADATA_API bool enoughBytesLeft(std::istream& stream, std::uint64_t total, std::uint64_t needed);
 
 /// Any 32-bit size below 8, not only 1, is followed by a 64-bit one. The size counts the whole atom.
-bool readAtomSizeAndType(std::istream& stream, std::uint64_t total, std::uint64_t& size, std::uint32_t& type);
+ZULMETADATA_API bool readAtomSizeAndType(std::istream& stream, std::uint64_t total, std::uint64_t& size,
+                                         std::uint32_t& type);
 
 /// The type as it is stored; the size counts the chunk's data.
-bool readChunkTypeAndSize(std::istream& stream, std::uint64_t total, std::uint32_t& type, std::uint32_t& size);
+ZULMETADATA_API bool readChunkTypeAndSize(std::istream& stream, std::uint64_t total, std::uint32_t& type,
+                                          std::uint32_t& size);
 
 } // namespace ParserUtil
 
 /// Appends streams to a movie as one `ZULM` atom of `DATA` atoms. A trailing partial entry is left out, but the
 /// size of its `DATA` atom counts it. Both throw `std::runtime_error` "Got an entry size of 0" for such an entry
 /// in a stream of entries that vary in size; the atom then keeps a size of 0, which `finalizeAtomsInFile` mends.
-struct MP4MetaData {
+struct ZULMETADATA_API MP4MetaData {
     /// False, with a line on standard output, where the movie or one of the streams cannot be opened. The other
     /// streams are appended all the same.
     static bool appendMetaDataFiles(const std::string& path, const std::vector<std::string>& files);
@@ -100,7 +103,7 @@ struct MP4MetaData {
     static void appendMetaData(const std::string& path, const std::map<uuid, std::string>& streams);
 };
 
-struct Util {
+struct ZULMETADATA_API Util {
     /// Gives the last atom of a movie that was cut short its real size. True where the atoms (now) fill the file.
     /// An open-ended atom of 4 GiB and more needs the 8 spare bytes of a `wide` atom in front of it; it then gets
     /// the length that it had without them, 8 bytes less than it now has.

@@ -7,6 +7,7 @@
 //     } printer;
 //     MetaDataReader<Point>::parseStream(printer, file, 0, fileSize, -1);
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/CursorImageWriter.h"
 #include "ZULMetaData/InvalidEntry.h"
 #include "ZULMetaData/StreamBufferAccess.h"
@@ -24,7 +25,7 @@
 namespace ZULMetaData {
 
 template <class T>
-class DataStreamObserver {
+class ZULMETADATA_API DataStreamObserver {
 public:
     /// `time` is in seconds; a list of strings always comes with 0. False ends the parse.
     virtual bool dataRead(double time, const T& value) = 0;
@@ -59,15 +60,16 @@ void metaDataRead(std::istream& stream, double* time, T* value, int version);
 
 namespace detail {
 
-bool isSupportedVersion(const MetaDataHeader& header, int version);
+ZULMETADATA_API bool isSupportedVersion(const MetaDataHeader& header, int version);
 
 /// Clears the stream's state, seeks to `start` and reads the header there. False where no entry can follow; a
 /// refused version has then been reported.
-bool readSupportedHeader(std::istream& stream, std::uint64_t start, int version, MetaDataHeader& header);
+ZULMETADATA_API bool readSupportedHeader(std::istream& stream, std::uint64_t start, int version,
+                                         MetaDataHeader& header);
 
 /// The readers give the bytes that the entry took; meaningless where the input ended inside it.
-std::uint64_t readStringEntry(std::istream& stream, double& time, std::string& text);
-std::uint64_t readStringListEntry(std::istream& stream, std::list<std::string>& texts);
+ZULMETADATA_API std::uint64_t readStringEntry(std::istream& stream, double& time, std::string& text);
+ZULMETADATA_API std::uint64_t readStringListEntry(std::istream& stream, std::list<std::string>& texts);
 
 template <FixedSizeValue T>
 std::uint64_t readFixedEntry(std::istream& stream, double& time, T& value) {

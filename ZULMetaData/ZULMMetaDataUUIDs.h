@@ -2,6 +2,7 @@
 
 // The header in front of every metadata stream, and the registry of the kinds of streams.
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 
 #include <array>
@@ -95,9 +96,9 @@ inline constexpr std::array<MetaDataKind, 23> s_metaDataKinds{{
 }};
 
 /// The registered kind of a stream, or null. Silent, unlike `currentVersionForUUID`.
-const MetaDataKind* findMetaDataKind(const uuid& type);
+ZULMETADATA_API const MetaDataKind* findMetaDataKind(const uuid& type);
 
-struct MetaDataUUID {
+struct ZULMETADATA_API MetaDataUUID {
     /// The version that is written today; -1 for an unknown kind, with one line on standard output.
     static int currentVersionForUUID(const uuid& type);
 };

@@ -8,6 +8,7 @@
 //     writer.close();
 
 #include "SharedDependencies/EndianFile.h"
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/CursorImageWriter.h"
 #include "ZULMetaData/StreamBufferAccess.h"
 #include "ZULMetaData/ZULMMetaDataCommon.h"
@@ -36,7 +37,7 @@ void metaDataWrite(double time, const T& value, std::ostream& stream, int versio
 /// Nothing here reports an error: where the file cannot be opened or written, the stream that `getStream` gives
 /// is in a failed state and entries are dropped. `A` and `B` play no part in the format.
 template <StreamValue T, class A, class B>
-class MetaDataWriter {
+class ZULMETADATA_API MetaDataWriter {
 public:
     MetaDataWriter() = default;
     MetaDataWriter(const MetaDataWriter&) = delete;

@@ -5,6 +5,8 @@
 //     for (const EntryDictionary& entry : *parser.read())
 //         std::cout << entry.get<std::int32_t>("x") << " at " << entry.get<float>("timestamp") << '\n';
 
+#include "SharedDependencies/Export.h"
+
 #include <array>
 #include <atomic>
 #include <concepts>
@@ -35,7 +37,7 @@ using EntryKeys = std::vector<std::string>;
 ///
 /// Hours of recording make millions of entries, nearly all of them numbers: those are kept inline, 56 bytes in all, and
 /// become `EntryValue`s only where somebody asks for one.
-class EntryDictionary {
+class ZULMETADATA_API EntryDictionary {
 public:
     static constexpr std::size_t maxSize = 5;
     using Values = std::array<EntryValue, maxSize>;

@@ -2,21 +2,23 @@
 
 // Stored bytes as texts for the application.
 
+#include "SharedDependencies/Export.h"
+
 #include <cstddef>
 #include <string>
 #include <string_view>
 
 namespace ZULMetaData {
 
-bool isUTF8(std::string_view bytes);
+ZULMETADATA_API bool isUTF8(std::string_view bytes);
 
 /// Bytes of the whole, valid characters that `bytes` begins with.
-std::size_t validUTF8Length(std::string_view bytes);
+ZULMETADATA_API std::size_t validUTF8Length(std::string_view bytes);
 
 /// The bytes up to the first zero byte. Throws `std::invalid_argument` where they are not UTF-8.
-std::string textFromUTF8(const std::string& bytes);
+ZULMETADATA_API std::string textFromUTF8(const std::string& bytes);
 
 /// The bytes up to the first zero byte, each the character of its number (ISO 8859-1), as UTF-8.
-std::string textFromLatin1(const std::string& bytes);
+ZULMETADATA_API std::string textFromLatin1(const std::string& bytes);
 
 } // namespace ZULMetaData

@@ -2,11 +2,13 @@
 
 // Texts for recorded input actions, such as "left down + shift" or "<Shift><Cmd>".
 
+#include "SharedDependencies/Export.h"
+
 #include <string>
 
 namespace ZULMetaData {
 
-struct HumanReadableActions {
+struct ZULMETADATA_API HumanReadableActions {
     /// Whether every bit of `flag` is set. Throws `std::invalid_argument` "Flag should not be empty." for 0.
     static bool HasFlag(int value, int flag);
 

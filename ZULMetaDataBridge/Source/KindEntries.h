@@ -2,6 +2,7 @@
 
 // What the kind of a stream tells about its entries, for code that handles streams of any kind.
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
 
@@ -12,16 +13,16 @@
 namespace ZULMetaData {
 
 /// Whether the stream is of a kind and version whose entries can be decoded here.
-bool isDecodable(const MetaDataHeader& header);
+ZULMETADATA_API bool isDecodable(const MetaDataHeader& header);
 
 /// Bytes of each of its entries, 0 where they vary: what readers of its kind go by, whatever the header says. Of a
 /// stream that cannot be decoded, what the header says.
-std::uint32_t entrySizeOf(const MetaDataHeader& header);
+ZULMETADATA_API std::uint32_t entrySizeOf(const MetaDataHeader& header);
 
 /// Entries as readers of the stream's kind tell them apart.
-StreamEntries entriesOf(ReadBytes read, std::uint64_t length);
+ZULMETADATA_API StreamEntries entriesOf(ReadBytes read, std::uint64_t length);
 
 /// None where the entry does not fit its kind, and where the stream cannot be decoded.
-std::optional<double> timeOfEntry(const MetaDataHeader& header, std::string_view bytes);
+ZULMETADATA_API std::optional<double> timeOfEntry(const MetaDataHeader& header, std::string_view bytes);
 
 } // namespace ZULMetaData

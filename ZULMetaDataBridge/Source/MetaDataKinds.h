@@ -3,6 +3,7 @@
 // What is peculiar to each kind of metadata that the application records and reads: the value its entries hold,
 // the identifier and version of its stream, and the keys under which its entries are read back.
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
 #include "ZULMetaDataBridge/Source/EntryDictionary.h"
@@ -126,7 +127,7 @@ struct TopmostAppNameKind {
 };
 
 /// The image that an entry carries, or the text "nil" where it has none or one that cannot be decoded.
-EntryValue entryImage(const CursorImage& cursor);
+ZULMETADATA_API EntryValue entryImage(const CursorImage& cursor);
 
 struct CursorImageKind {
     using Value = CursorImage;

@@ -8,6 +8,7 @@
 //         std::cerr << finding.offset << ": " << finding.sentence << '\n';
 
 #include "Platform/FileLocation.h"
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <array>
@@ -136,7 +137,7 @@ struct Finding {
 };
 
 /// One stream, walked from its header to its end or to the first entry behind which no other can be found.
-struct StreamReport {
+struct ZULMETADATA_API StreamReport {
     uuid type{};
     std::string kind; ///< its name in the registry; empty where it is not registered
     std::int32_t version = -1;
@@ -155,7 +156,7 @@ struct StreamReport {
     std::string name() const;
 };
 
-struct ValidationReport {
+struct ZULMETADATA_API ValidationReport {
     /// More of either severity are only counted, so that the report stays small whatever the file.
     static constexpr std::size_t s_maximumFindings = 1000;
     static constexpr std::size_t s_maximumStreams = 1000;
@@ -176,9 +177,9 @@ struct ValidationReport {
 
 /// The extension tells the container, as for `MetaDataParser`. Throws `std::runtime_error` for a file that cannot be
 /// read or is no container by its name.
-ValidationReport validateRecording(const FileLocation& file);
+ZULMETADATA_API ValidationReport validateRecording(const FileLocation& file);
 
 /// Throws `std::runtime_error` for a stream that cannot be read and for the type `Unknown`.
-ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type);
+ZULMETADATA_API ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type);
 
 } // namespace ZULMetaData

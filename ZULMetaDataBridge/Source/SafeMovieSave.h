@@ -7,6 +7,7 @@
 //         std::cout << stream.name << ": " << stream.entries << " entries, " << stream.bytesCut << " bytes cut off\n";
 
 #include "Platform/FileLocation.h"
+#include "SharedDependencies/Export.h"
 #include "SharedDependencies/ZCAPHeader.h"
 #include "ZULMetaData/RepairPlan.h"
 #include "ZULMetaData/StreamExtent.h"
@@ -21,7 +22,7 @@
 namespace ZULMetaData {
 
 /// Why a movie was not changed as it should: one sentence about one file.
-class SaveError : public std::runtime_error {
+class ZULMETADATA_API SaveError : public std::runtime_error {
 public:
     enum class Reason {
         Failed,     ///< the movie is what it was
@@ -70,7 +71,7 @@ struct StampResult {
 ///
 /// A program that ends in the middle of it leaves an append that was interrupted, which the next operation repairs.
 /// The movie is locked against other programs that use this class. Needs about a megabyte, whatever the streams hold.
-class SafeMovieSave {
+class ZULMETADATA_API SafeMovieSave {
 public:
     /// What to do about streams of kinds that the movie has already. Readers take the last one: the others would stay
     /// in the file, unread.

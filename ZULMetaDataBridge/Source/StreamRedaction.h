@@ -7,6 +7,7 @@
 //     std::ofstream copy("keyboardAction.dat", std::ios::binary);
 //     redactStream(StreamSource::file("private/keyboardAction.dat").open(), redaction, copy);
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
 #include "ZULMetaDataBridge/Source/StreamSource.h"
 
@@ -59,6 +60,7 @@ struct RedactedStream {
 };
 
 /// Appends the copy to `out`, or nothing where the stream is removed. Failures of `out` show in its state alone.
-RedactedStream redactStream(const StreamSource::Bytes& stream, const Redaction& redaction, std::ostream& out);
+ZULMETADATA_API RedactedStream redactStream(const StreamSource::Bytes& stream, const Redaction& redaction,
+                                            std::ostream& out);
 
 } // namespace ZULMetaData

@@ -8,6 +8,7 @@
 //     for (const SalvagedStream& stream : salvage.run().streams)
 //         std::cout << stream.header.uuid << " at " << stream.offset << ": " << stream.entries << " entries\n";
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
@@ -56,7 +57,7 @@ struct SalvageReport {
 ///
 /// Every stream ends at the latest where the next one begins; one without a declared length also at the first entry
 /// whose time makes no sense.
-class StreamSalvage {
+class ZULMETADATA_API StreamSalvage {
 public:
     /// Called now and then with how many bytes have been searched.
     using Progress = std::function<void(std::uint64_t done)>;

@@ -4,6 +4,7 @@
 // or in memory.
 
 #include "Platform/FileLocation.h"
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/StreamExtent.h"
 
 #include <cstdint>
@@ -14,7 +15,7 @@
 namespace ZULMetaData {
 
 /// Opens nothing before it is used. Copies are the same stream.
-class StreamSource {
+class ZULMETADATA_API StreamSource {
 public:
     /// A whole stream file.
     static StreamSource file(const FileLocation& file);

@@ -1,10 +1,11 @@
 #pragma once
 
 #include "Platform/FileLocation.h"
+#include "SharedDependencies/Export.h"
 
 namespace ZULMetaData {
 
-class ZULMAtomRepair {
+class ZULMETADATA_API ZULMAtomRepair {
 public:
     /// Gives the last atom of a movie that was cut short its real size; see `Util::finalizeAtomsInFile`.
     static bool finalizeAtomsInFile(const FileLocation& file);

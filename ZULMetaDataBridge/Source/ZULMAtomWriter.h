@@ -1,12 +1,13 @@
 #pragma once
 
 #include "Platform/FileLocation.h"
+#include "SharedDependencies/Export.h"
 
 #include <vector>
 
 namespace ZULMetaData {
 
-class ZULMAtomWriter {
+class ZULMETADATA_API ZULMAtomWriter {
 public:
     /// Repairs the movie's last atom and appends the stream files behind it as one atom, in this order. Failures
     /// to open a file show on standard output alone; throws as `MP4MetaData::appendMetaDataFiles` does.

@@ -1,13 +1,14 @@
 #pragma once
 
 #include "Platform/FileLocation.h"
+#include "SharedDependencies/Export.h"
 #include "SharedDependencies/ZCAPHeader.h"
 
 #include <string>
 
 namespace ZULMetaData {
 
-class ZULRAtomWriter {
+class ZULMETADATA_API ZULRAtomWriter {
 public:
     /// Repairs the movie's last atom and appends a `ZULR` atom of 80 bytes: the header, then a `ZCAPHeader` of
     /// version 1. Every call appends another one.
@@ -19,6 +20,6 @@ public:
 };
 
 /// What `writeZULRtoFile` stores, for the system that this program runs on.
-ZCAPHeader recordingInfo(const std::string& creatorName, const std::string& creatorVersion);
+ZULMETADATA_API ZCAPHeader recordingInfo(const std::string& creatorName, const std::string& creatorVersion);
 
 } // namespace ZULMetaData

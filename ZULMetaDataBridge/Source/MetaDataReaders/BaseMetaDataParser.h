@@ -3,6 +3,7 @@
 // What every parser of the family shares: the location of its file, and how a stream is copied out of it.
 
 #include "Platform/FileLocation.h"
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 
 #include <memory>
@@ -11,7 +12,7 @@
 namespace ZULMetaData {
 
 /// Opens its file only while it reads. Used by one thread at a time; separate parsers share nothing.
-class BaseMetaDataParser {
+class ZULMETADATA_API BaseMetaDataParser {
 public:
     BaseMetaDataParser() = default;
     BaseMetaDataParser(const BaseMetaDataParser&) = delete;

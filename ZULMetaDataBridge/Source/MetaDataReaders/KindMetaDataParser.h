@@ -2,6 +2,7 @@
 
 // The mechanism of the parser family. A class of the family adds the name of its list.
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 #include "ZULMetaDataBridge/Source/EntryBuilding.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
@@ -16,7 +17,7 @@
 namespace ZULMetaData {
 
 template <class Kind>
-class KindMetaDataParser : public BaseMetaDataParser {
+class ZULMETADATA_API KindMetaDataParser : public BaseMetaDataParser {
 public:
     KindMetaDataParser() = default;
     explicit KindMetaDataParser(const FileLocation& file) { this->initWithMetaDataFile(file); }

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataReader.h"
 
 #include <vector>
@@ -8,7 +9,7 @@ namespace ZULMetaData {
 
 /// Collects every entry of a stream, in the order in which they come.
 template <StreamValue T>
-class MetaDataObserver : public DataStreamObserver<T> {
+class ZULMETADATA_API MetaDataObserver : public DataStreamObserver<T> {
 public:
     std::vector<T> values;
     std::vector<double> times; ///< in seconds, one for each value

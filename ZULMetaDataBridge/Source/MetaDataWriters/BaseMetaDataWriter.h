@@ -3,6 +3,7 @@
 // What every writer of the family shares: the location of its stream file.
 
 #include "Platform/FileLocation.h"
+#include "SharedDependencies/Export.h"
 
 #include <cstdint>
 
@@ -10,7 +11,7 @@ namespace ZULMetaData {
 
 /// A writer reports nothing by itself: where its file cannot be created or written, what it is given is dropped. An
 /// application asks `isHealthy` now and then. Used by one thread at a time; separate writers share nothing.
-class BaseMetaDataWriter {
+class ZULMETADATA_API BaseMetaDataWriter {
 public:
     BaseMetaDataWriter() = default;
     BaseMetaDataWriter(const BaseMetaDataWriter&) = delete;

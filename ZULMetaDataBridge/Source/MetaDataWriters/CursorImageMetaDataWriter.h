@@ -1,6 +1,7 @@
 #pragma once
 
 #include "Platform/Image.h"
+#include "SharedDependencies/Export.h"
 #include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
 
 #include <cstdint>
@@ -9,7 +10,7 @@ namespace ZULMetaData {
 
 /// What the cursor looked like. Images repeat: the application numbers its cursors, writes each image once, and
 /// afterwards only its number. The first entry and every 15th after it are flushed.
-class CursorImageMetaDataWriter final : public KindMetaDataWriter<CursorImageKind> {
+class ZULMETADATA_API CursorImageMetaDataWriter final : public KindMetaDataWriter<CursorImageKind> {
 public:
     CursorImageMetaDataWriter() = default;
     explicit CursorImageMetaDataWriter(const FileLocation& file) { initWithMetaDataFile(file); }

@@ -3,6 +3,7 @@
 // The mechanism of the writer family: how a stream writer is created and released, and the three ways of writing.
 // A class of the family adds what is peculiar to its kind.
 
+#include "SharedDependencies/Export.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/ApplicationValues.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
@@ -20,7 +21,7 @@ namespace ZULMetaData {
 enum class StreamWriterRelease { WithWriter, Never };
 
 template <class Kind, StreamWriterRelease Release = StreamWriterRelease::WithWriter>
-class KindMetaDataWriter : public BaseMetaDataWriter {
+class ZULMETADATA_API KindMetaDataWriter : public BaseMetaDataWriter {
 public:
     using StreamWriter = MetaDataWriter<typename Kind::Value, int, int>;
 
@@ -87,7 +88,7 @@ private:
 
 /// Any number of entries, each flushed unless `setFlushEveryWrite(false)` leaves that to the file buffer.
 template <class Kind>
-class ContinuousMetaDataWriter : public KindMetaDataWriter<Kind> {
+class ZULMETADATA_API ContinuousMetaDataWriter : public KindMetaDataWriter<Kind> {
 public:
     ContinuousMetaDataWriter() = default;
     explicit ContinuousMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); }
@@ -113,7 +114,7 @@ private:
 
 /// Texts, stored as they are.
 template <class Kind>
-class TextMetaDataWriter : public ContinuousMetaDataWriter<Kind> {
+class ZULMETADATA_API TextMetaDataWriter : public ContinuousMetaDataWriter<Kind> {
 public:
     using ContinuousMetaDataWriter<Kind>::ContinuousMetaDataWriter;
 
@@ -129,7 +130,7 @@ inline constexpr std::uint32_t s_flushInterval = 15;
 
 /// Any number of entries, of which the first and every 15th after it are flushed.
 template <class Kind>
-class CountedMetaDataWriter : public KindMetaDataWriter<Kind> {
+class ZULMETADATA_API CountedMetaDataWriter : public KindMetaDataWriter<Kind> {
 public:
     CountedMetaDataWriter() = default;
     explicit CountedMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); }
@@ -159,7 +160,7 @@ private:
 
 /// One entry at time 0, after which the file is closed and every further one is ignored.
 template <class Kind, StreamWriterRelease Release>
-class OneShotMetaDataWriter : public KindMetaDataWriter<Kind, Release> {
+class ZULMETADATA_API OneShotMetaDataWriter : public KindMetaDataWriter<Kind, Release> {
 public:
     OneShotMetaDataWriter() = default;
     explicit OneShotMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); }

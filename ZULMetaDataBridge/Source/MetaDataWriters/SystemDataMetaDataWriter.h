@@ -1,6 +1,7 @@
 #pragma once
 
 #include "Platform/ProcessInfo.h"
+#include "SharedDependencies/Export.h"
 #include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
 
 #include <list>
@@ -9,7 +10,8 @@
 namespace ZULMetaData {
 
 /// The machine that records: processors, operating system and memory. Its stream writer stays when it goes.
-class SystemDataMetaDataWriter final : public OneShotMetaDataWriter<SystemDataKind, StreamWriterRelease::Never> {
+class ZULMETADATA_API SystemDataMetaDataWriter final
+    : public OneShotMetaDataWriter<SystemDataKind, StreamWriterRelease::Never> {
 public:
     using OneShotMetaDataWriter::OneShotMetaDataWriter;
 
