@@ -6,6 +6,7 @@ set -euo pipefail
 build=(g++ cmake ninja-build ccache libpng-dev libtiff-dev libcli11-dev nlohmann-json3-dev libfmt-dev libre2-dev)
 media=(ffmpeg)
 test=(libgtest-dev libgmock-dev imagemagick pngcheck libimage-exiftool-perl mediainfo groff-base python3-jsonschema zsh fish)
+consumers=(clang make pkg-config binutils)
 check=(clang clang-format git)
 bench=(mediainfo)
 reliability=(python3 valgrind strace)
