@@ -8,7 +8,10 @@
 #include <gtest/gtest.h>
 
 #include <map>
+#include <memory>
 #include <sstream>
+#include <stdexcept>
+#include <system_error>
 
 namespace ZULMetaData::Test {
 namespace {
@@ -78,6 +81,33 @@ TEST(MetaDataExcerpt, OfARIFFFileIsOne) {
 
 TEST(MetaDataExcerpt, OfABareStreamIsAllOfIt) {
     EXPECT_EQ(excerptOf(stream("2b7b6af2"), MetaDataParser::RawStream), stream("2b7b6af2"));
+}
+
+/// Cannot be read from some position on.
+class FailingBuffer : public std::stringbuf {
+public:
+    FailingBuffer(const std::string& bytes, std::size_t end) : std::stringbuf(bytes), end_(end) {}
+    std::size_t end_;
+
+protected:
+    std::streamsize xsgetn(char* bytes, std::streamsize count) override {
+        if (static_cast<std::size_t>(gptr() - eback()) + static_cast<std::size_t>(count) > end_)
+            throw std::runtime_error("the disk is broken");
+        return std::stringbuf::xsgetn(bytes, count);
+    }
+    int_type underflow() override { return traits_type::eof(); }
+};
+
+TEST(MetaDataExcerpt, IsNoneWhereTheRecordingCannotBeRead) {
+    const std::string movie = s_type + atom("mdat", std::string(5000, 'm')) + s_metaData;
+    FailingBuffer buffer(movie, movie.size());
+    std::istream input(&buffer);
+    const auto parser = MetaDataParser::create(input, MetaDataParser::QuickTime);
+    EXPECT_EQ(metaDataExcerpt(*parser), s_type + s_metaData);
+    for (const std::size_t end : {std::size_t{4}, s_type.size() + 4, movie.size() - 1}) {
+        buffer.end_ = end;
+        EXPECT_THROW(metaDataExcerpt(*parser), std::system_error) << end;
+    }
 }
 
 TEST(MetaDataExcerpt, OfAMovieWithoutMetaDataIsItsTypeAlone) {

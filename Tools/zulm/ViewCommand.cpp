@@ -16,7 +16,6 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
-#include <iterator>
 #include <memory>
 #include <vector>
 
@@ -53,9 +52,9 @@ std::string pageFor(const ViewOptions& options) {
     requireFile(options.page);
     std::ifstream file;
     fileOpen(file, options.page.c_str(), std::ios::binary);
-    const std::string page{std::istreambuf_iterator<char>(file), {}};
-    if (file.bad())
-        throw Failure(fmt::format("{}: cannot be read", options.page));
+    std::string page(std::filesystem::file_size(options.page), '\0');
+    file.read(page.data(), static_cast<std::streamsize>(page.size()));
+    requireRead(file, options.page);
     return page;
 }
 

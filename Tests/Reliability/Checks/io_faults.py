@@ -33,6 +33,7 @@ def cases(streams):
     damaged = {"Broken.mp4": recording(streams)[:-10]}
     interrupted = {"Movie.mp4": WHOLE_MOVIE + sized_atom(b"ZULM", 0, recording(streams)[len(WHOLE_MOVIE) + 16:-10])}
     movie = {"Movie.mp4": OPEN_MOVIE}
+    page = {"Page.html": b"<head></head>"}
     stamp = ["stamp", "Movie.mp4", "--creator", "Recorder", "--creator-version", "1.0"]
     return [
         Case("info", ["info", "Recording.mp4"], whole),
@@ -48,6 +49,7 @@ def cases(streams):
         Case("salvage", ["salvage", "Broken.mp4", "-o", "out"], damaged),
         Case("redact", ["redact", "Recording.mp4", "--keys", "-o", "Out.mp4"], whole),
         Case("convert", ["convert", "--to", "srt", "Recording.mp4", "-o", "Out.srt"], whole),
+        Case("view", ["view", "Recording.mp4", "-o", "Out.html", "--page", "Page.html"], whole | page),
     ]
 
 
