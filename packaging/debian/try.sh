@@ -1,0 +1,24 @@
+#!/bin/sh
+# Runs inside a Debian that has g++ and in /root the packages: see scripts/package.sh.
+set -eu
+cd /root
+apt-get install -y -qq --no-install-recommends ./packages/*.deb >/dev/null
+
+awk '/^```/ { inside = !inside && $0 == "```cpp"; next } inside' README.md >example.cpp
+g++ -std=c++20 example.cpp -lZULMetaDataBridge -lZULMetaData -o example
+printf '\0\0\0\20ftypmp42\0\0\0\0' >Recording.mp4
+
+{
+    ./example
+    zulm --version
+    zulm info Recording.mp4
+    zulm verify Recording.mp4
+} >printed.txt
+grep -qx '640 0' printed.txt
+grep -q '^ *cursorLocation .* 2 ' printed.txt
+
+apt-get purge -y -qq zulm-tools libzulmetadata-dev libzulmetadata1 >/dev/null
+if find /usr -iname '*zulm*' | grep .; then
+    echo "the packages leave files behind" >&2
+    exit 1
+fi

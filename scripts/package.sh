@@ -1,0 +1,24 @@
+#!/usr/bin/env bash
+# Builds the packages for Debian in build/package, installs them into a fresh Debian with g++ and nothing else, compiles
+# README's example there and looks at its recording with zulm. Usage: scripts/package.sh [OPTION...]; each OPTION goes
+# to cmake. BUILD names another folder.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+build=${BUILD:-build/package}
+
+scripts/install.sh build package
+cmake --preset release -B "$build" -DCMAKE_INSTALL_PREFIX=/usr -DBUILD_SHARED_LIBS=ON -DZULMETADATA_BUILD_TESTS=OFF \
+    "$@" >/dev/null
+cmake --build "$build"
+rm -rf "$build/packages"
+(cd "$build" && cpack -B packages >/dev/null)
+ls -l "$build"/packages/*.deb
+
+echo "== trying the packages in a fresh Debian"
+printed=$build/packages/printed.txt
+mmdebstrap --quiet --variant=apt --include=g++ \
+    --customize-hook="copy-in $build/packages README.md packaging/debian/try.sh /root" \
+    --customize-hook='chroot "$1" sh /root/try.sh' \
+    --customize-hook="download /root/printed.txt $printed" \
+    bookworm /dev/null
+cat "$printed"
