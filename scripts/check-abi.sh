@@ -1,0 +1,30 @@
+#!/usr/bin/env bash
+# Fails where programs that were linked against the shared libraries as packaging/abi describes them would not work with
+# these. Usage: scripts/check-abi.sh [update]; update describes them anew, after a release or where ZULMETADATA_ABI_VERSION
+# has gone up. The descriptions are of x86-64 and Debian's compiler.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+build=${BUILD:-build/abi}
+
+scripts/install.sh build abi
+cmake --preset release -B "$build" -DCMAKE_BUILD_TYPE=RelWithDebInfo -DBUILD_SHARED_LIBS=ON \
+    -DZULMETADATA_BUILD_TESTS=OFF -DZULMETADATA_BUILD_TOOLS=OFF >/dev/null
+cmake --build "$build" >/dev/null
+rm -rf "$build/installed"
+cmake --install "$build" --prefix "$build/installed" >/dev/null
+
+changed=0
+for library in libZULMetaData libZULMetaDataBridge; do
+    described=packaging/abi/$library.abi
+    now=$build/$library.abi
+    abidw --headers-dir "$build/installed/include" --suppressions packaging/abi/inside.ini --exported-interfaces-only \
+        --drop-private-types --no-show-locs --no-corpus-path --no-comp-dir-path --out-file "$now" "$build"/installed/lib*/$library.so
+    sed -i -E "s# path='[^']*/((SharedDependencies|ZULMetaData|ZULMetaDataBridge|Platform)/)# path='\\1#" "$now"
+    if [ "${1:-}" = update ]; then
+        cp "$now" "$described"
+    else
+        echo "== $library"
+        abidiff --no-added-syms --suppressions packaging/abi/inside.ini "$described" "$now" || changed=1
+    fi
+done
+exit $changed
