@@ -16,7 +16,7 @@ namespace ZULMetaData {
 namespace {
 
 constexpr std::size_t s_copySize = 2048;
-constexpr std::size_t s_streamBufferSize = 64 * 1024;
+constexpr std::size_t s_streamBufferSize = std::size_t{64} * 1024;
 
 /// The end of the last whole entry, of entries that begin with their size. Where not even the first is whole, all
 /// of it counts, unless its size itself is torn.
@@ -104,7 +104,7 @@ public:
     std::ofstream& stream() { return stream_; }
 
 private:
-    static constexpr std::size_t s_bufferSize = 128 * 1024;
+    static constexpr std::size_t s_bufferSize = std::size_t{128} * 1024;
 
     std::unique_ptr<char[]> buffer_{new char[s_bufferSize]}; // outlives the stream that writes out of it
     std::ofstream stream_;
