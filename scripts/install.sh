@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # Installs what this project needs from Debian's packages: scripts/install.sh GROUP...
 # Does nothing where it is there already.
+# shellcheck disable=SC2034 # groups are used by their names
 set -euo pipefail
 
 build=(g++ cmake ninja-build ccache libpng-dev libtiff-dev libcli11-dev nlohmann-json3-dev libfmt-dev libre2-dev)
@@ -8,6 +9,7 @@ media=(ffmpeg)
 test=(libgtest-dev libgmock-dev imagemagick pngcheck libimage-exiftool-perl mediainfo groff-base python3-jsonschema zsh fish)
 consumers=(clang make pkg-config binutils)
 check=(clang clang-format git)
+lint=(clang clang-format clang-tidy cppcheck shellcheck codespell git python3)
 package=(dpkg-dev file mmdebstrap)
 abi=(abigail-tools)
 bench=(mediainfo)

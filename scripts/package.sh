@@ -16,6 +16,7 @@ ls -l "$build"/packages/*.deb
 
 echo "== trying the packages in a fresh Debian"
 printed=$build/packages/printed.txt
+# shellcheck disable=SC2016 # mmdebstrap knows the folder
 mmdebstrap --quiet --variant=apt --include=g++ \
     --customize-hook="copy-in $build/packages README.md packaging/debian/try.sh /root" \
     --customize-hook='chroot "$1" sh /root/try.sh' \
