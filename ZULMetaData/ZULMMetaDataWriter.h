@@ -61,7 +61,7 @@ public:
     ~MetaDataWriter() { close(); }
 
 private:
-    static constexpr std::size_t s_bufferSize = 64 * 1024;
+    static constexpr std::size_t s_bufferSize = std::size_t{64} * 1024;
 
     std::string path;
     std::unique_ptr<char[]> buffer; // outlives the stream that writes out of it
