@@ -16,6 +16,7 @@ function(zulm_library target name)
   if(type STREQUAL "STATIC_LIBRARY" OR NOT ZULMETADATA_BUILD_TESTS) # the tests look inside
     set_target_properties(${target} PROPERTIES CXX_VISIBILITY_PRESET hidden VISIBILITY_INLINES_HIDDEN ON)
   endif()
+  # Each symbol says which version it is of, so that two can live in one process.
   if(type STREQUAL "SHARED_LIBRARY" AND CMAKE_SYSTEM_NAME STREQUAL "Linux")
     set(symbols ${PROJECT_BINARY_DIR}/symbols.map)
     file(CONFIGURE OUTPUT ${symbols} CONTENT "ZULMETADATA_@ZULMETADATA_ABI_VERSION@ { global: *; };\n" @ONLY)
