@@ -54,8 +54,9 @@ Coverage coverageAt(const Shape& shape, int x, int y, int scale) {
     constexpr double rim = 1.1;
     Coverage coverage;
     for (int sample = 0; sample < s_samples * s_samples; ++sample) {
-        const ScreenPoint point((x + (sample % s_samples + 0.5) / s_samples) / scale,
-                                (y + (sample / s_samples + 0.5) / s_samples) / scale);
+        const int column = sample % s_samples;
+        const int row = sample / s_samples;
+        const ScreenPoint point((x + (column + 0.5) / s_samples) / scale, (y + (row + 0.5) / s_samples) / scale);
         const bool inside = contains(shape, point);
         const bool nearOutline = distanceToOutline(shape, point) < rim;
         coverage.black += inside && !nearOutline;
@@ -84,7 +85,7 @@ std::shared_ptr<const Image> drawn(const Shape& shape, int scale) {
 
 std::vector<Cursor> drawnCursors(int scale) {
     const auto cursor = [scale](std::int64_t number, ScreenPoint hotSpot, const Shape& shape) {
-        return Cursor{number + 10 * scale, static_cast<std::int32_t>(number),
+        return Cursor{number + std::int64_t{10} * scale, static_cast<std::int32_t>(number),
                       ScreenPoint(hotSpot.x * scale, hotSpot.y * scale), drawn(shape, scale)};
     };
     return {cursor(1, {5, 3}, s_arrow), cursor(2, {12, 4}, s_hand), cursor(3, {16, 16}, s_beam)};

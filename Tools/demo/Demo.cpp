@@ -43,6 +43,7 @@ bool equal(const EntryList& list, const std::vector<ExpectedEntry>& expected) {
 
 void attach(const std::vector<Track>& tracks, const FileLocation& movie) {
     std::vector<FileLocation> files;
+    files.reserve(tracks.size());
     for (const Track& track : tracks)
         files.push_back(track.file);
     ZULMAtomWriter().writeMetaDataFiles(files, movie);
