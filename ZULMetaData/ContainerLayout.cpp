@@ -112,6 +112,8 @@ void visitChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end, s
 void visitTopLevel(std::istream& stream, MetaDataParser::StreamType type, const ContainerVisitor& visit) {
     stream.clear();
     const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+    if (stream.fail())
+        return;
     if (type == MetaDataParser::QuickTime)
         visitAtoms(stream, 0, s_anywhere, total, visit);
     else if (type == MetaDataParser::Riff)

@@ -60,10 +60,14 @@ ReadBytes readingFrom(std::istream& input) {
         if (input.fail() && isBehindEnd(input, position))
             return 0;
         input.read(bytes.data(), static_cast<std::streamsize>(bytes.size()));
-        if (input.bad() || (input.fail() && !input.eof())) // what cannot be read must not pass for what is not there
-            throw std::system_error(EIO, std::generic_category(), "cannot be read");
+        requireReadable(input);
         return static_cast<std::size_t>(input.gcount());
     };
+}
+
+void requireReadable(const std::istream& input) {
+    if (input.bad() || (input.fail() && !input.eof()))
+        throw std::system_error(EIO, std::generic_category(), "cannot be read");
 }
 
 } // namespace ZULMetaData

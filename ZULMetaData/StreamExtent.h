@@ -43,4 +43,8 @@ ZULMETADATA_API std::optional<StreamExtent> measureStream(std::istream& input, s
 /// `std::system_error` where reading fails.
 ZULMETADATA_API ReadBytes readingFrom(std::istream& input);
 
+/// Throws `std::system_error` where `input` has failed otherwise than by its end: what cannot be read must not pass for
+/// what is not there.
+ZULMETADATA_API void requireReadable(const std::istream& input);
+
 } // namespace ZULMetaData

@@ -29,6 +29,16 @@ TEST(ContainerLayout, GivesPlaceAndSizeOfEveryAtom) {
     EXPECT_EQ(atoms[2].offset, 33U);
 }
 
+TEST(ContainerLayout, LeavesAStreamFailedWhoseSizeCannotBeTold) {
+    struct UnseekableBuffer final : std::stringbuf {
+        using std::stringbuf::stringbuf;
+        pos_type seekoff(off_type, std::ios_base::seekdir, std::ios_base::openmode) override { return off_type(-1); }
+    } buffer(atom("ftyp", "isom"));
+    std::istream stream(&buffer);
+    EXPECT_TRUE(listTopLevel(stream, MetaDataParser::QuickTime).empty());
+    EXPECT_TRUE(stream.fail());
+}
+
 TEST(ContainerLayout, TellsTheFormsOfHeadersApart) {
     const auto atoms = itemsOf(atom("ftyp") + be32(5) + "oddl" + be64(16) + extendedAtom("mdat"));
     ASSERT_EQ(atoms.size(), 3U);

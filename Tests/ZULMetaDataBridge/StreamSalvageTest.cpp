@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <sstream>
+#include <system_error>
 
 namespace ZULMetaData::Test {
 namespace {
@@ -90,6 +91,24 @@ TEST(StreamSalvage, EndsWhereTheDeviceFails) {
     } buffer(media() + zulmAtom({locationStream()}));
     std::istream file(&buffer);
     EXPECT_TRUE(StreamSalvage(file, MetaDataParser::RawStream).run().streams.empty());
+}
+
+TEST(StreamSalvage, CannotSearchAFileWhoseSizeCannotBeTold) {
+    struct UnseekableBuffer final : std::stringbuf {
+        using std::stringbuf::stringbuf;
+        pos_type seekoff(off_type, std::ios_base::seekdir, std::ios_base::openmode) override { return off_type(-1); }
+    } buffer(media() + zulmAtom({locationStream()}));
+    std::istream file(&buffer);
+    EXPECT_THROW(StreamSalvage(file, MetaDataParser::QuickTime), std::system_error);
+}
+
+TEST(StreamSalvage, CannotSearchAFileThatCannotBeRead) {
+    struct UnreadableBuffer final : std::stringbuf {
+        using std::stringbuf::stringbuf;
+        std::streamsize xsgetn(char*, std::streamsize) override { throw std::ios_base::failure("cannot be read"); }
+    } buffer(media() + zulmAtom({locationStream()}));
+    std::istream file(&buffer);
+    EXPECT_THROW(StreamSalvage(file, MetaDataParser::QuickTime).run(), std::system_error);
 }
 
 TEST(StreamSalvage, FindsStreamsBehindADataAtomThatCountsATornTail) {

@@ -105,8 +105,8 @@ ExitCode complainAboutLoss(const std::string& name, const RedactedCopy& copy) {
 }
 
 ExitCode complainAboutDamage(const std::string& path, const std::string& output) {
-    const ValidationReport report = validateRecording(FileLocation(path));
-    if (!report.isDamaged())
+    Recording copy(path, output);
+    if (!copy.validation().isDamaged())
         return ExitFine;
     complain(fmt::format("{}: what was damaged in the input still is in the copy; 'zulm verify {}' says what", output,
                          shellWord(output)));

@@ -98,9 +98,11 @@ void RedactedCopy::requireWholeContainer() {
 /// Metadata in a place that is copied as it is would stay in the copy.
 void RedactedCopy::requireNothingHidden() {
     Progress progress("searching " + recording_.name(), total_);
-    StreamSalvage salvage(recording_.parser().getStream(), container(),
-                          [&progress](std::uint64_t done) { progress.moveTo(done); });
-    const SalvageReport report = orUnreadable(recording_.name(), [&] { return salvage.run(); });
+    const SalvageReport report = orUnreadable(recording_.name(), [&] {
+        return StreamSalvage(recording_.parser().getStream(), container(),
+                             [&progress](std::uint64_t done) { progress.moveTo(done); })
+            .run();
+    });
     if (report.hasMore)
         throw Failure(fmt::format("{}: has more than {} places that look like streams; not all could be looked into",
                                   recording_.name(), SalvageReport::s_maximumStreams));

@@ -37,8 +37,11 @@ SalvageReport search(const std::string& path) {
     std::ifstream file;
     fileOpen(file, path.c_str(), std::ios::binary);
     Progress progress("searching " + path, std::filesystem::file_size(path));
-    StreamSalvage salvage(file, MetaDataParser::streamTypeOf(path), [&](std::uint64_t done) { progress.moveTo(done); });
-    return orUnreadable(path, [&] { return salvage.run(); });
+    return orUnreadable(path, [&] {
+        return StreamSalvage(file, MetaDataParser::streamTypeOf(path),
+                             [&](std::uint64_t done) { progress.moveTo(done); })
+            .run();
+    });
 }
 
 /// Of each kind the best comes first and gets the plain name.

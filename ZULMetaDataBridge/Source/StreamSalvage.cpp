@@ -130,7 +130,8 @@ ReadBytes readingBehind(ReadBytes read, std::uint64_t offset) {
 StreamSalvage::StreamSalvage(std::istream& file, MetaDataParser::StreamType type, Progress progress)
     : read_(readingFrom(file)), file_(file), type_(type), progress_(std::move(progress)) {
     file_.clear();
-    total_ = static_cast<std::uint64_t>(std::max<std::int64_t>(ParserUtil::calcFileSize(file_), 0));
+    total_ = static_cast<std::uint64_t>(ParserUtil::calcFileSize(file_));
+    requireReadable(file_);
 }
 
 SalvageReport StreamSalvage::run() {
@@ -158,9 +159,13 @@ void StreamSalvage::findReachable() {
     if (type_ == MetaDataParser::RawStream)
         return add(0, 0, total_);
     const auto listChildren = type_ == MetaDataParser::QuickTime ? listAtoms : listChunks;
-    for (const ContainerItem& item : listTopLevel(file_, type_))
+    const auto readable = [this](std::vector<ContainerItem> items) {
+        requireReadable(file_);
+        return items;
+    };
+    for (const ContainerItem& item : readable(listTopLevel(file_, type_)))
         if (item.holdsMetaData() && item.size != 0)
-            for (const ContainerItem& child : listChildren(file_, item.payloadOffset(), item.end(), total_))
+            for (const ContainerItem& child : readable(listChildren(file_, item.payloadOffset(), item.end(), total_)))
                 if (child.holdsStream())
                     add(child.offset, child.payloadOffset(), child.payloadSize());
 }

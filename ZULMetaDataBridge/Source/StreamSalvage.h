@@ -63,10 +63,10 @@ public:
     using Progress = std::function<void(std::uint64_t done)>;
 
     /// `file` is the caller's and must outlive this. Of the type `Unknown` or `RawStream` nothing is walked, but what a
-    /// bare stream file begins with is reachable.
+    /// bare stream file begins with is reachable. Throws `std::system_error` where the file has no size.
     StreamSalvage(std::istream& file, MetaDataParser::StreamType type, Progress progress = {});
 
-    /// Searches the whole file, in a few megabytes of memory.
+    /// Searches the whole file, in a few megabytes of memory. Throws `std::system_error` where it cannot be read.
     SalvageReport run();
 
 private:
