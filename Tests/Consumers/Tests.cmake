@@ -31,14 +31,14 @@ function(zulm_add_cmake_consumer name project program)
     -DCMAKE_EXPORT_NO_PACKAGE_REGISTRY=ON --test-command ${program})
 endfunction()
 zulm_add_cmake_consumer(find_package find_package application
-  -DCMAKE_PREFIX_PATH=${shared} -DCMAKE_CXX_COMPILER=${CMAKE_CXX_COMPILER} -DEXPECT_TOOLS=FALSE)
+  -DCMAKE_PREFIX_PATH=${shared} -DCMAKE_CXX_COMPILER=${CMAKE_CXX_COMPILER} -DEXPECT_TOOLS=FALSE -DEXPECT_VIEWER=FALSE)
 set(tools FALSE)
 if(ZULMETADATA_BUILD_TOOLS)
   set(tools TRUE)
 endif()
 zulm_add_cmake_consumer(find_package_clang_static find_package application
   -DCMAKE_PREFIX_PATH=${static} -DCMAKE_CXX_COMPILER=${CLANGXX} -DCMAKE_CXX_STANDARD=23
-  -DEXPECT_TOOLS=${tools})
+  -DEXPECT_TOOLS=${tools} -DEXPECT_VIEWER=$<BOOL:${ZULM_VIEWER}>)
 zulm_add_cmake_consumer(add_subdirectory add_subdirectory player
   -DZULMETADATA_SOURCE=${PROJECT_SOURCE_DIR} -DCMAKE_CXX_COMPILER=${CMAKE_CXX_COMPILER})
 
