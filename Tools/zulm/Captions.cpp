@@ -86,7 +86,7 @@ std::string utf8(std::uint32_t codePoint) {
 
 /// What a key types that has no name: its code is the character.
 std::string unnamedCharacter(std::uint32_t code, const std::string& name, const Modifiers& modifiers) {
-    const std::string number = fmt::format("[key {}]", code);
+    std::string number = fmt::format("[key {}]", code);
     if (code > 0xff) {
         const std::string text = code < 0x110000 ? utf8(code) : std::string();
         return isUTF8(text) && !text.empty() ? text : number;

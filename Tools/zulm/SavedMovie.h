@@ -58,7 +58,7 @@ public:
     auto save(const std::string& what, Work work) {
         try {
             makeCopy();
-            const auto result = work(ZULMetaData::SafeMovieSave(path_, progress(what)));
+            auto result = work(ZULMetaData::SafeMovieSave(path_, progress(what)));
             commit();
             return result;
         } catch (const ZULMetaData::SaveError& error) {
