@@ -1,10 +1,16 @@
-# Runs the example, under the emulator where there is one, in an empty folder and looks at what it prints.
-set(folder ${CMAKE_CURRENT_BINARY_DIR}/record_and_read.run)
-file(REMOVE_RECURSE ${folder})
-file(MAKE_DIRECTORY ${folder})
-file(WRITE ${folder}/Recording.mp4 "")
-execute_process(COMMAND ${EMULATOR} ${PROGRAM} WORKING_DIRECTORY ${folder}
-  OUTPUT_VARIABLE output COMMAND_ERROR_IS_FATAL ANY)
-if(NOT output STREQUAL "640 0\n652 0.0166667\n")
-  message(FATAL_ERROR "The example printed:\n${output}")
+# Runs PROGRAM, under the EMULATOR where there is one, in a FOLDER that holds a movie of nothing but a file type, and
+# compares what it prints with EXPECTED. BEFORE, where there is one, runs ahead of it. Both get the ARGUMENT.
+file(REMOVE_RECURSE ${FOLDER})
+file(MAKE_DIRECTORY ${FOLDER})
+execute_process(COMMAND printf "\\0\\0\\0\\20ftypmp42\\0\\0\\0\\0" OUTPUT_FILE ${FOLDER}/Recording.mp4
+  COMMAND_ERROR_IS_FATAL ANY)
+if(BEFORE)
+  execute_process(COMMAND ${EMULATOR} ${BEFORE} ${ARGUMENT} WORKING_DIRECTORY ${FOLDER}
+    OUTPUT_QUIET COMMAND_ERROR_IS_FATAL ANY)
+endif()
+execute_process(COMMAND ${EMULATOR} ${PROGRAM} ${ARGUMENT} WORKING_DIRECTORY ${FOLDER}
+  OUTPUT_VARIABLE printed ERROR_VARIABLE complaints RESULT_VARIABLE ended)
+file(READ ${EXPECTED} expected)
+if(NOT ended EQUAL 0 OR NOT printed STREQUAL expected OR complaints)
+  message(FATAL_ERROR "It ended with ${ended} and printed:\n${printed}${complaints}\nnot:\n${expected}")
 endif()

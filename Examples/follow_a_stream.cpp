@@ -1,0 +1,71 @@
+// Follows a stream file while a recorder still writes it: another thread here, any other process elsewhere.
+
+#include "ZULMetaDataBridge/ZULMetaDataBridge.h"
+
+#include <atomic>
+#include <chrono>
+#include <fstream>
+#include <iostream>
+#include <thread>
+
+using namespace ZULMetaData;
+
+namespace {
+
+/// Gives the positions that have come since it was last asked. Entries reach the file when the writer flushes; one that
+/// is there in part only is left for the next time.
+class CursorFollower {
+public:
+    explicit CursorFollower(const FileLocation& file) : path_(file) {}
+
+    template <class Take>
+    void poll(Take&& take) {
+        std::ifstream stream(path_, std::ios::binary);
+        const std::int64_t size = ParserUtil::calcFileSize(stream);
+        stream.seekg(position_);
+        while (position_ + s_entrySize <= size) {
+            double time = 0;
+            Point location;
+            metaDataRead(stream, &time, &location, CursorLocationKind::version);
+            position_ += s_entrySize;
+            take(time, location);
+        }
+    }
+
+private:
+    static constexpr std::int64_t s_entrySize = sizeof(double) + sizeof(Point);
+
+    FileLocation path_;
+    std::int64_t position_ = s_metaDataHeaderSize;
+};
+
+} // namespace
+
+int main() {
+    const FileLocation file = "followed.dat";
+    CursorLocationMetaDataWriter writer(file); // creates the file, so that there is one to follow
+    std::atomic<int> seen = 0;
+    std::thread recorder([&] {
+        for (int entry = 0; entry <= 30; ++entry) // flushed: the 1st, the 16th and the 31st
+            writer.write(ScreenPoint(entry * 10, 100), MediaTime(entry, 10));
+        while (seen < 31)
+            std::this_thread::sleep_for(std::chrono::milliseconds(1));
+        writer.write(ScreenPoint(999, 100), MediaTime(31, 10)); // waits in the buffer until the file is closed
+        writer.finish();
+    });
+
+    CursorFollower follower(file);
+    double lastTime = 0;
+    Point last;
+    while (seen < 32) {
+        follower.poll([&](double time, const Point& location) {
+            lastTime = time;
+            last = location;
+            if (++seen == 31)
+                std::cout << "31 positions while it was being written, the last at " << time << " s\n";
+        });
+        std::this_thread::sleep_for(std::chrono::milliseconds(1));
+    }
+    recorder.join();
+    std::cout << seen << " in all, the last at " << lastTime << " s: " << last << '\n';
+}

@@ -1,0 +1,55 @@
+// Keeps something of one's own in a recording: a stream of a kind that this library does not know. own_kind MOVIE
+// Readers that do not know the kind leave it alone; saving and `zulm` carry it along.
+
+#include "ZULMetaDataBridge/ZULMetaDataBridge.h"
+
+#include <fstream>
+#include <iostream>
+
+using namespace ZULMetaData;
+
+namespace {
+
+/// Made once, with any generator of UUIDs.
+constexpr uuid s_heartRateUUID{
+    {0x5d, 0x1c, 0x0a, 0x6e, 0x0b, 0x7f, 0x4c, 0x35, 0x9e, 0x0d, 0x43, 0xa1, 0x6b, 0x2f, 0x88, 0x17}};
+constexpr int s_version = 1;
+
+void record(const FileLocation& file) {
+    MetaDataWriter<float, int, int> writer;
+    writer.init(file.string(), s_heartRateUUID, s_version);
+    for (int second = 0; second < 5; ++second)
+        writer.write(second, 61.5F + static_cast<float>(second), true);
+    writer.close();
+}
+
+/// Checks every size, and needs no kind: `MetaDataParser::loadDataType` would do too, but tells on standard output that
+/// it does not know this one.
+void read(const FileLocation& movie) {
+    const auto parser = MetaDataParser::create(movie.string());
+    const auto place = parser->fileDataForUUID(s_heartRateUUID);
+    const StreamSource::Bytes bytes = StreamSource::part(movie, place.offset, place.length).open();
+    StreamEntries entries(bytes.read, bytes.length);
+    while (const auto entry = entries.next())
+        if (const auto decoded = decodeEntry<float>(entries.bytesOf(*entry), s_version))
+            std::cout << decoded->time << " s: " << decoded->value << " beats a minute\n";
+}
+
+} // namespace
+
+int main(int count, char** arguments) {
+    if (count != 2) {
+        std::cerr << "usage: own_kind MOVIE\n";
+        return 2;
+    }
+    try {
+        const FileLocation movie = arguments[1];
+        const FileLocation file = movie.parent_path() / "heartRate.dat";
+        record(file);
+        SafeMovieSave(movie).attach({StreamSource::file(file)});
+        read(movie);
+    } catch (const std::exception& error) {
+        std::cerr << error.what() << '\n';
+        return 1;
+    }
+}

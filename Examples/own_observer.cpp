@@ -1,0 +1,53 @@
+// Takes entries one by one as they are read, without a list of them: how far the cursor went in the first seconds.
+// own_observer RECORDING
+
+#include "ZULMetaDataBridge/ZULMetaDataBridge.h"
+
+#include <cmath>
+#include <iostream>
+#include <optional>
+
+using namespace ZULMetaData;
+
+namespace {
+
+class Odometer final : public DataStreamObserver<Point> {
+public:
+    explicit Odometer(double seconds) : end_(seconds) {}
+
+    bool dataRead(double time, const Point& location) override {
+        if (time > end_)
+            return false; // nothing more is read
+        if (previous_)
+            pixels_ += std::hypot(location.x - previous_->x, location.y - previous_->y);
+        previous_ = location;
+        ++positions_;
+        return true;
+    }
+
+    double pixels() const { return pixels_; }
+    int positions() const { return positions_; }
+
+private:
+    double end_;
+    double pixels_ = 0;
+    int positions_ = 0;
+    std::optional<Point> previous_;
+};
+
+} // namespace
+
+int main(int count, char** arguments) {
+    const auto parser = count == 2 ? MetaDataParser::create(arguments[1]) : nullptr;
+    if (!parser) {
+        std::cerr << "usage: own_observer RECORDING\n";
+        return 2;
+    }
+    Odometer odometer(2.0);
+    try {
+        parser->loadDataType<Point>(s_cursorLocationUUID, odometer, -1);
+    } catch (const std::runtime_error& error) { // the last entry is cut short; those in front of it have come
+        std::cerr << error.what() << '\n';
+    }
+    std::cout << odometer.positions() << " positions, " << std::lround(odometer.pixels()) << " pixels\n";
+}
