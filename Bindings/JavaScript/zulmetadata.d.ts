@@ -53,9 +53,16 @@ export class Recording {
   readonly duration?: number;
   /** In the order of their identifiers. */
   readonly streams: StreamSummary[];
+  /**
+   * Streams that the file holds and no reader finds, in its order: a later one of the kind took their place, or they lie
+   * behind damage.
+   */
+  readonly hidden: StreamSummary[];
 
   /** Of the stream of this kind, or with this identifier. Throws a `ZulmError` where there is none. */
   entries(kind: string): Entries;
+  /** Of a hidden stream, by its place among `hidden`. */
+  hiddenEntries(index: number): Entries;
   /** The file's object of `zulm info --json`. */
   info(): object;
   /** The file's object of `zulm verify --json`. */

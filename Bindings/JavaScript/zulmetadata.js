@@ -133,6 +133,12 @@ class Core {
     return new Numbers(this.memory, place, count).slice();
   }
 
+  /** All that `name` gives, of which there are as many as `name` with `_count` says. */
+  streamsOf(recording, name) {
+    const count = this.exports[`${name}_count`](recording) >>> 0;
+    return Array.from({ length: count }, (_, index) => this.streamAt(this.exports[name](recording, index) >>> 0));
+  }
+
   streamAt(place) {
     const view = new DataView(this.memory, place);
     const pointer = (offset) => view.getUint32(offset, true);
@@ -151,6 +157,17 @@ class Core {
       if (!Number.isNaN(time)) summary[end] = time;
     }
     return summary;
+  }
+
+  takeEntries(entries, kind) {
+    const { exports } = this;
+    const count = exports.zulm_entry_count(entries) >>> 0;
+    const columns = Array.from({ length: exports.zulm_column_count(entries) >>> 0 }, (_, index) =>
+      this.columnAt(exports.zulm_column(entries, index) >>> 0, count),
+    );
+    const time = this.copied(Float64Array, exports.zulm_entry_times(entries) >>> 0, count);
+    exports.zulm_free_entries(entries);
+    return { kind, time, columns: Object.fromEntries(columns) };
   }
 
   columnAt(place, count) {
@@ -213,24 +230,23 @@ export class Recording {
       this.container = core.textAt(core.exports.zulm_container(this.#handle));
       const duration = core.exports.zulm_duration(this.#handle);
       if (!Number.isNaN(duration)) this.duration = duration;
-      const count = core.exports.zulm_stream_count(this.#handle) >>> 0;
-      this.streams = Array.from({ length: count }, (_, index) =>
-        core.streamAt(core.exports.zulm_stream(this.#handle, index) >>> 0),
-      );
+      this.streams = core.streamsOf(this.#handle, 'zulm_stream');
+      this.hidden = core.streamsOf(this.#handle, 'zulm_hidden');
     });
   }
 
   entries(kind) {
     return this.#guarded((core) => {
-      const { exports } = core;
       const entries = core.withText(kind, (place) => core.call('zulm_read_entries', this.#handle, place));
-      const count = exports.zulm_entry_count(entries) >>> 0;
-      const columns = Array.from({ length: exports.zulm_column_count(entries) >>> 0 }, (_, index) =>
-        core.columnAt(exports.zulm_column(entries, index) >>> 0, count),
-      );
-      const time = core.copied(Float64Array, exports.zulm_entry_times(entries) >>> 0, count);
-      exports.zulm_free_entries(entries);
-      return { kind, time, columns: Object.fromEntries(columns) };
+      return core.takeEntries(entries, kind);
+    });
+  }
+
+  hiddenEntries(index) {
+    return this.#guarded((core) => {
+      const stream = this.hidden[index];
+      if (!stream) throw new ZulmError(`${this.#name}: hides no stream ${index}`);
+      return core.takeEntries(core.call('zulm_read_hidden', this.#handle, index), stream.kind);
     });
   }
 

@@ -47,13 +47,17 @@ struct ZulmRecording {
     Zulm::Recording recording;
     std::string container;
     std::optional<double> duration;
-    std::vector<Zulm::StreamInfo> infos;
     struct Names {
         std::string kind; // or its identifier where it has none
         std::string uuid;
     };
-    std::vector<Names> names;
-    std::vector<ZulmStream> streams;
+    struct Streams {
+        std::vector<Zulm::StreamInfo> infos;
+        std::vector<Names> names;
+        std::vector<ZulmStream> summaries;
+    };
+    Streams found;
+    Streams hidden;
 };
 
 struct ZulmEntries {
@@ -115,21 +119,26 @@ MetaDataParser::StreamType typeOf(const ReadSlice& read, const std::string& name
 
 constexpr double s_nothing = std::numeric_limits<double>::quiet_NaN();
 
+void summarise(ZulmRecording::Streams& streams, std::vector<Zulm::StreamInfo> infos) {
+    streams.infos = std::move(infos);
+    for (const Zulm::StreamInfo& info : streams.infos)
+        streams.names.push_back({Zulm::nameOf(info.type), Zulm::uuidText(info.type)});
+    for (std::size_t i = 0; i < streams.infos.size(); ++i) {
+        const Zulm::StreamInfo& info = streams.infos[i];
+        streams.summaries.push_back({streams.names[i].kind.c_str(), streams.names[i].uuid.c_str(), info.version,
+                                     info.isDecodable ? info.entries : 0, info.range.length, info.range.offset,
+                                     info.firstTime.value_or(s_nothing), info.lastTime.value_or(s_nothing),
+                                     info.isDecodable ? 1 : 0});
+    }
+}
+
 void fillIn(ZulmRecording& opened) {
     Zulm::Recording& recording = opened.recording;
     opened.container = recording.container();
     opened.duration = movieDuration(recording.parser());
     Zulm::requireRead(opened.input, recording.name());
-    opened.infos = recording.streams();
-    for (const Zulm::StreamInfo& info : opened.infos)
-        opened.names.push_back({Zulm::nameOf(info.type), Zulm::uuidText(info.type)});
-    for (std::size_t i = 0; i < opened.infos.size(); ++i) {
-        const Zulm::StreamInfo& info = opened.infos[i];
-        opened.streams.push_back({opened.names[i].kind.c_str(), opened.names[i].uuid.c_str(), info.version,
-                                  info.isDecodable ? info.entries : 0, info.range.length, info.range.offset,
-                                  info.firstTime.value_or(s_nothing), info.lastTime.value_or(s_nothing),
-                                  info.isDecodable ? 1 : 0});
-    }
+    summarise(opened.found, recording.streams());
+    summarise(opened.hidden, recording.hiddenStreams());
 }
 
 /// The type of the column that a field of this type fills.
@@ -190,16 +199,31 @@ private:
 };
 
 const Zulm::StreamInfo& infoNamed(const ZulmRecording& opened, const std::string& kind) {
-    for (std::size_t i = 0; i < opened.infos.size(); ++i)
-        if (opened.names[i].kind == kind || opened.names[i].uuid == kind)
-            return opened.infos[i];
+    const auto& [infos, names, summaries] = opened.found;
+    for (std::size_t i = 0; i < infos.size(); ++i)
+        if (names[i].kind == kind || names[i].uuid == kind)
+            return infos[i];
     throw Zulm::Failure(fmt::format("{}: holds no stream {}", opened.recording.name(), kind));
+}
+
+std::unique_ptr<ZulmEntries> readEntries(ZulmRecording& opened, const Zulm::StreamInfo& info) {
+    auto entries = std::make_unique<ZulmEntries>();
+    if (!info.isDecodable)
+        throw Zulm::Failure(fmt::format("{}: entries of {}, version {}, cannot be decoded", opened.recording.name(),
+                                        Zulm::nameOf(info.type), info.version));
+    RecordedKinds::visit(info.type, [&]<class Kind>() {
+        EntryCollector<Kind> collector(*entries);
+        opened.recording.readEntries<typename Kind::Value>(info, collector);
+    });
+    for (const EntryColumn& column : entries->columns)
+        entries->views.push_back(column.view());
+    return entries;
 }
 
 std::vector<uuid> typesNamed(const ZulmRecording& opened, const char* kinds) {
     std::vector<uuid> types;
     if (!kinds) {
-        for (const Zulm::StreamInfo& info : opened.infos)
+        for (const Zulm::StreamInfo& info : opened.found.infos)
             types.push_back(info.type);
         return types;
     }
@@ -238,28 +262,27 @@ double zulm_duration(const ZulmRecording* recording) {
 }
 
 size_t zulm_stream_count(const ZulmRecording* recording) {
-    return recording->streams.size();
+    return recording->found.summaries.size();
 }
 
 const ZulmStream* zulm_stream(const ZulmRecording* recording, size_t index) {
-    return &recording->streams[index];
+    return &recording->found.summaries[index];
+}
+
+size_t zulm_hidden_count(const ZulmRecording* recording) {
+    return recording->hidden.summaries.size();
+}
+
+const ZulmStream* zulm_hidden(const ZulmRecording* recording, size_t index) {
+    return &recording->hidden.summaries[index];
 }
 
 ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind) {
-    return orNull([&] {
-        const Zulm::StreamInfo& info = infoNamed(*recording, kind);
-        auto entries = std::make_unique<ZulmEntries>();
-        if (!info.isDecodable)
-            throw Zulm::Failure(fmt::format("{}: entries of {}, version {}, cannot be decoded",
-                                            recording->recording.name(), Zulm::nameOf(info.type), info.version));
-        RecordedKinds::visit(info.type, [&]<class Kind>() {
-            EntryCollector<Kind> collector(*entries);
-            recording->recording.readEntries<typename Kind::Value>(info, collector);
-        });
-        for (const EntryColumn& column : entries->columns)
-            entries->views.push_back(column.view());
-        return entries.release();
-    });
+    return orNull([&] { return readEntries(*recording, infoNamed(*recording, kind)).release(); });
+}
+
+ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index) {
+    return orNull([&] { return readEntries(*recording, recording->hidden.infos[index]).release(); });
 }
 
 void zulm_free_entries(ZulmEntries* entries) {

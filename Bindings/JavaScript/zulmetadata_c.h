@@ -61,6 +61,11 @@ typedef struct {
 size_t zulm_stream_count(const ZulmRecording* recording);
 const ZulmStream* zulm_stream(const ZulmRecording* recording, size_t index);
 
+/* Streams that the file holds and no reader finds, in its order: a later one of the kind took their place, or they lie
+   behind damage. Everything else here is about those that readers find. */
+size_t zulm_hidden_count(const ZulmRecording* recording);
+const ZulmStream* zulm_hidden(const ZulmRecording* recording, size_t index);
+
 typedef enum {
     ZulmInt32 = 0, /* int32_t */
     ZulmInt64 = 1, /* int64_t */
@@ -84,6 +89,7 @@ typedef struct {
 
 /* Of the stream of this kind, or with this identifier; as far as they are whole. */
 ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind);
+ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index);
 void zulm_free_entries(ZulmEntries* entries);
 
 size_t zulm_entry_count(const ZulmEntries* entries);

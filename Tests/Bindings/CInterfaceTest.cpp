@@ -146,6 +146,43 @@ TEST_F(CInterface, GivesRealNumbersWithTheDigitsThatTellThem) {
     EXPECT_THAT(valuesOf<double>(entries.get(), 0), testing::ElementsAre(39.00953));
 }
 
+TEST_F(CInterface, GivesWhatALaterStreamOfTheKindHides) {
+    const std::string later = streamHeader("2b7b6af2", 1, 16) + pointEntry(1, 8, 9);
+    source_.bytes = movieWith(extendedAtom("DATA", locations()) + extendedAtom("DATA", later));
+    const OpenRecording recording = opened(source_, "Two.mp4");
+    ASSERT_TRUE(recording) << zulm_last_error();
+    const ReadEntries found(zulm_read_entries(recording.get(), "cursorLocation"));
+    EXPECT_THAT(valuesOf<std::int32_t>(found.get(), 0), testing::ElementsAre(8));
+    ASSERT_EQ(zulm_stream_count(recording.get()), 1U);
+    ASSERT_EQ(zulm_hidden_count(recording.get()), 1U);
+    EXPECT_STREQ(zulm_hidden(recording.get(), 0)->kind, "cursorLocation");
+    EXPECT_EQ(zulm_hidden(recording.get(), 0)->entries, 3U);
+    EXPECT_LT(zulm_hidden(recording.get(), 0)->offset, zulm_stream(recording.get(), 0)->offset);
+    const ReadEntries hidden(zulm_read_hidden(recording.get(), 0));
+    ASSERT_TRUE(hidden) << zulm_last_error();
+    EXPECT_THAT(valuesOf<std::int32_t>(hidden.get(), 0), testing::ElementsAre(10, 0, 3));
+}
+
+TEST_F(CInterface, GivesStreamsBehindDamage) {
+    const std::string torn = be32(1) + "DATA" + be64(16 + locations().size() + 9) + locations();
+    source_.bytes = movieWith(torn + extendedAtom("DATA", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "Editor")));
+    const OpenRecording recording = opened(source_, "Torn.mp4");
+    ASSERT_TRUE(recording) << zulm_last_error();
+    ASSERT_EQ(zulm_hidden_count(recording.get()), 1U);
+    EXPECT_STREQ(zulm_hidden(recording.get(), 0)->kind, "topmostAppName");
+    const ReadEntries hidden(zulm_read_hidden(recording.get(), 0));
+    ASSERT_TRUE(hidden) << zulm_last_error();
+    EXPECT_EQ(textOf(hidden.get(), 0, 0), "Editor");
+}
+
+TEST_F(CInterface, HidesNothingWhereEveryStreamIsFound) {
+    EXPECT_EQ(zulm_hidden_count(open().get()), 0U);
+    source_.bytes = locations();
+    EXPECT_EQ(zulm_hidden_count(opened(source_, "a.dat").get()), 0U);
+    source_.bytes = oddMovie();
+    EXPECT_EQ(zulm_hidden_count(opened(source_, "Odd.mp4").get()), 0U);
+}
+
 TEST_F(CInterface, PrintsWhatTheToolPrints) {
     const OpenRecording recording = open();
     const json info = json::parse(taken(zulm_info(recording.get())));
@@ -195,6 +232,10 @@ TEST_F(CInterface, LivesThroughEveryDamagedFile) {
             const ReadEntries entries(zulm_read_entries(recording.get(), stream.uuid));
             EXPECT_EQ(entries != nullptr, stream.isKnown == 1) << file.name;
             EXPECT_LE(entries ? zulm_entry_count(entries.get()) : 0, stream.entries) << file.name;
+        }
+        for (std::size_t i = 0; i < zulm_hidden_count(recording.get()); ++i) {
+            const ReadEntries entries(zulm_read_hidden(recording.get(), i));
+            EXPECT_EQ(entries != nullptr, zulm_hidden(recording.get(), i)->isKnown == 1) << file.name;
         }
     }
 }

@@ -23,6 +23,19 @@ std::string damageIn(const StreamReport& stream) {
                        others == 0 ? std::string() : fmt::format(" ({} more)", others));
 }
 
+/// Fills in what walking the stream has told.
+void examine(StreamInfo& info, const StreamReport& report) {
+    const MetaDataKind* kind = findMetaDataKind(info.type);
+    info.version = report.version;
+    info.isDecodable = kind && info.version >= 1 && info.version <= kind->currentVersion &&
+                       RecordedKinds::visit(info.type, []<class Kind>() {});
+    info.entries = report.wholeEntries;
+    info.firstTime = report.firstTime;
+    info.lastTime = report.lastTime;
+    info.readableBytes = report.readableBytes;
+    info.damage = damageIn(report);
+}
+
 } // namespace
 
 Recording::Recording(std::istream& input, MetaDataParser::StreamType type, std::string name) : name_(std::move(name)) {
@@ -85,15 +98,23 @@ StreamInfo Recording::streamInfo(const uuid& type) {
         info.damage = "it could not be examined";
         return info;
     }
-    info.version = found->version;
-    info.isDecodable = kind && info.version >= 1 && info.version <= kind->currentVersion &&
-                       RecordedKinds::visit(type, []<class Kind>() {});
-    info.entries = found->wholeEntries;
-    info.firstTime = found->firstTime;
-    info.lastTime = found->lastTime;
-    info.readableBytes = found->readableBytes;
-    info.damage = damageIn(*found);
+    examine(info, *found);
     return info;
+}
+
+std::vector<StreamInfo> Recording::hiddenStreams() {
+    std::vector<StreamInfo> hidden;
+    for (const StreamReport& stream : validation().streams) {
+        const auto taken = parser_->fileDataForUUID(stream.type);
+        if (stream.presentBytes < s_metaDataHeaderSize || (taken.length > 0 && taken.offset == stream.offset))
+            continue;
+        StreamInfo& info = hidden.emplace_back();
+        info.type = stream.type;
+        info.kind = stream.kind;
+        info.range = {stream.offset, stream.declaredBytes};
+        examine(info, stream);
+    }
+    return hidden;
 }
 
 void requireRead(const std::istream& stream, const std::string& name) {

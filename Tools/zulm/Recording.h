@@ -76,6 +76,10 @@ public:
     std::vector<StreamInfo> streams();
     StreamInfo streamInfo(const ZULMetaData::uuid& type);
 
+    /// The streams that the file holds and no reader finds, in its order: a later one of the kind took their place, or
+    /// they lie behind damage.
+    std::vector<StreamInfo> hiddenStreams();
+
     /// Delivers the entries of a decodable stream as far as they are whole.
     template <class Value>
     void readEntries(const StreamInfo& stream, ZULMetaData::DataStreamObserver<Value>& observer) {

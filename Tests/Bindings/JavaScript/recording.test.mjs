@@ -1,11 +1,13 @@
 // The module against the tool: both are the same library.
 
 import assert from 'node:assert/strict';
+import { join } from 'node:path';
 import { after, test } from 'node:test';
 import { bytesOf, load, recordedSession, reportsOf, temporaryFolder, zulm } from './support.mjs';
 
 const { Recording, ZulmError } = await load('zulmetadata.js');
-const { movie, streams } = recordedSession(temporaryFolder(after));
+const folder = temporaryFolder(after);
+const { movie, streams } = recordedSession(folder);
 
 const open = (file) => Recording.open(bytesOf(file), file);
 
@@ -94,6 +96,20 @@ test('takes kinds by their identifiers too', async () => {
   const recording = await open(movie);
   const { kind, uuid } = recording.streams.find(({ kind }) => kind === 'slideText');
   assert.deepEqual(recording.entries(uuid).columns, recording.entries(kind).columns);
+});
+
+test('gives what a later stream of its kind hides', async () => {
+  const [file] = streams.filter((path) => path.endsWith('/slideText.dat'));
+  const two = join(folder, 'Two.mp4');
+  assert.equal(zulm('attach', movie, file, '--replace', '-o', two).status, 0);
+  const recording = await open(two);
+  assert.deepEqual(
+    recording.hidden.map(({ kind, entries }) => [kind, entries]),
+    [['slideText', 3]],
+  );
+  assert.deepEqual(recording.hiddenEntries(0), recording.entries('slideText'));
+  assert.throws(() => recording.hiddenEntries(1), /hides no stream 1$/);
+  assert.deepEqual((await open(movie)).hidden, []);
 });
 
 test('recognises containers without a name', async () => {

@@ -22,18 +22,18 @@ def files(context, folder):
     return [folder / name for name in made]
 
 
-def flip(context, number, chosen, random_cases):
+def flip(context, part, chosen, random_cases):
     with recordings.fast_folder() as scratch:
-        return check.run([context.program("bit_flips"), scratch, str(random_cases), str(number), *chosen], timeout=3600)
+        return check.run([context.program("bit_flips"), scratch, str(part), str(WORKERS), str(random_cases), *chosen],
+                         timeout=3600, environment={"ASAN_OPTIONS": "malloc_context_size=1:quarantine_size_mb=1"})
 
 
 def run(context):
     chosen = files(context, context.folder)
-    groups = [chosen[:1], chosen[1:]]
     random_cases = RANDOM_CASES // WORKERS if context.full else 0
     result = check.Result()
     with concurrent.futures.ThreadPoolExecutor(WORKERS) as pool:
-        for done in pool.map(lambda job: flip(context, job[0], job[1], random_cases), enumerate(groups)):
+        for done in pool.map(lambda part: flip(context, part, chosen, random_cases), range(WORKERS)):
             result.failures += done.stderr.decode(errors="replace").splitlines()
             result.crashed += done.returncode != 0
             if done.returncode == 0:

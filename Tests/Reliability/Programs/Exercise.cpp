@@ -35,11 +35,12 @@ struct Counter final : DataStreamObserver<Value> {
 
 } // namespace
 
-Exercise::Exercise(const std::string& folder, const std::string& extension)
+Exercise::Exercise(const std::string& folder, const std::string& extension, FileParsers parsers)
     : path_(folder + "/case" + extension), copy_(folder + "/copy" + extension),
-      type_(MetaDataParser::streamTypeOf(path_)) {}
+      type_(MetaDataParser::streamTypeOf(path_)), parsers_(parsers) {}
 
 void Exercise::run(const std::string& bytes) {
+    ++cases_;
     bytes_ = bytes;
     hasDemanded_ = false;
     writeFile(path_, bytes_);
@@ -100,7 +101,10 @@ void Exercise::salvage() {
 }
 
 void Exercise::readAsFile() {
+    std::uint64_t index = 0;
     RecordedKinds::forEach([&]<class Kind>() {
+        if (parsers_ == InTurn && index++ != cases_ % RecordedKinds::size)
+            return;
         const auto read = [&] { KindMetaDataParser<Kind>(path_).read(); };
         if constexpr (isBelieved<typename Kind::Value>)
             guardReading("a parser", read);

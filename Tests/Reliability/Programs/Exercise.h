@@ -18,8 +18,11 @@ public:
 
 class Exercise {
 public:
+    /// The parsers that open a file: all of them read each case, or each case is read by the next of them.
+    enum FileParsers { EachTime, InTurn };
+
     /// `folder` is for the files of the cases; `extension` tells the container.
-    Exercise(const std::string& folder, const std::string& extension);
+    Exercise(const std::string& folder, const std::string& extension, FileParsers parsers = EachTime);
 
     /// Validates, salvages and reads everything, as a file and as a stream; repairs and appends where the file is a
     /// movie. Throws for any end but the documented ones, for what takes more than a second, and where more memory is
@@ -44,6 +47,8 @@ private:
     std::string path_;
     std::string copy_;
     ZULMetaData::MetaDataParser::StreamType type_;
+    FileParsers parsers_;
+    std::uint64_t cases_ = 0;
     std::string bytes_;
     bool isDamaged_ = false;
     bool hasDemanded_ = false;

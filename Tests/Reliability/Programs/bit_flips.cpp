@@ -1,5 +1,7 @@
-// bit_flips FOLDER RANDOM SEED FILE...: flips every bit of each file, then three bits at random places RANDOM times,
-// and does everything with what comes of it. Prints "CASES DEMANDING", and on standard error what does not hold.
+// bit_flips FOLDER PART PARTS RANDOM FILE...: flips every bit of each file, then three bits at random places RANDOM
+// times, and does everything with what comes of it. Of the bits, every PARTS-th from the one numbered PART on is its
+// own. Prints "CASES DEMANDING", and on standard error what does not hold. Where RANDOM is 0, the parsers of files take
+// turns instead of reading each case all together.
 
 #include "Tests/Reliability/Programs/Exercise.h"
 #include "Tests/Reliability/Programs/Watch.h"
@@ -23,12 +25,12 @@ void flip(std::string& bytes, std::size_t bit) {
 
 class Flipper {
 public:
-    Flipper(const std::string& folder, const std::string& file)
+    Flipper(const std::string& folder, const std::string& file, Exercise::FileParsers parsers)
         : name_(std::filesystem::path(file).filename().string()), original_(contentsOf(file)),
-          exercise_(folder, std::filesystem::path(file).extension().string()) {}
+          exercise_(folder, std::filesystem::path(file).extension().string(), parsers) {}
 
-    void flipEach() {
-        for (std::size_t bit = 0; bit < bits(); ++bit)
+    void flipEach(std::size_t part, std::size_t parts) {
+        for (std::size_t bit = part; bit < bits(); bit += parts)
             run({bit});
     }
 
@@ -74,14 +76,17 @@ private:
 int main(int argc, char** argv) {
     std::FILE* const results = fdopen(dup(STDOUT_FILENO), "w");
     silence();
-    const std::uint64_t randomCases = std::strtoull(argv[2], nullptr, 10);
-    std::mt19937_64 random(std::strtoull(argv[3], nullptr, 10));
+    const auto number = [&](int i) { return std::strtoull(argv[i], nullptr, 10); };
+    constexpr int firstFile = 5;
+    const std::uint64_t part = number(2);
+    const std::uint64_t randomCases = number(4);
+    std::mt19937_64 random(part);
     std::uint64_t cases = 0;
     std::uint64_t demanding = 0;
-    for (int i = 4; i < argc; ++i) {
-        Flipper flipper(argv[1], argv[i]);
-        flipper.flipEach();
-        flipper.flipAtRandom(randomCases / static_cast<std::uint64_t>(argc - 4), random);
+    for (int i = firstFile; i < argc; ++i) {
+        Flipper flipper(argv[1], argv[i], randomCases > 0 ? Exercise::EachTime : Exercise::InTurn);
+        flipper.flipEach(part, number(3));
+        flipper.flipAtRandom(randomCases / static_cast<std::uint64_t>(argc - firstFile), random);
         cases += flipper.cases();
         demanding += flipper.demanding();
     }

@@ -4,6 +4,7 @@
 // synthetic recording of the tests.
 
 import { createHash } from 'node:crypto';
+import { readdirSync, readFileSync } from 'node:fs';
 import { fileURLToPath } from 'node:url';
 import { defineConfig, type Plugin } from 'vite';
 
@@ -22,6 +23,52 @@ function policy(script: string, style: string): string {
     "base-uri 'none'",
     "form-action 'none'",
   ].join('; ');
+}
+
+interface Licence {
+  name: string;
+  licence: string;
+  text: string;
+}
+
+const at = (path: string) => fileURLToPath(new URL(path, import.meta.url));
+
+/// Of what is compiled into the decoder: a line with its name and its licence, then the text.
+function licencesOfDecoder(): Licence[] {
+  const texts = ['zulmetadata', 'json', 'fmt', 'emscripten', 'musl', 'llvm'].map((name) =>
+    readFileSync(at(`licences/${name}.txt`), 'utf8'),
+  );
+  return texts.map((text) => {
+    const [, name = '', licence = '', rest = ''] = /^(.*?): (.*)\n\n([^]*)$/.exec(text) ?? [];
+    return { name, licence, text: rest.trim() };
+  });
+}
+
+/// Of every package that is in the page and not only builds it, as the package itself has it.
+function licencesOfPackages(): Licence[] {
+  const lock = JSON.parse(readFileSync(at('package-lock.json'), 'utf8')) as {
+    packages: Record<string, { version: string; license: string; dev?: boolean }>;
+  };
+  return Object.entries(lock.packages)
+    .filter(([path, { dev }]) => path !== '' && !dev)
+    .map(([path, { version, license }]) => {
+      const file = readdirSync(at(path)).find((name) => /^licen[cs]e/i.test(name));
+      if (!file) throw new Error(`${path} has no licence`);
+      const text = readFileSync(at(`${path}/${file}`), 'utf8').trim();
+      return { name: `${path.replace(/^node_modules\//, '')} ${version}`, licence: license, text };
+    });
+}
+
+/// The module '#licences'.
+function licences(): Plugin {
+  return {
+    name: 'licences',
+    resolveId: (id) => (id === '#licences' ? '\0licences' : undefined),
+    load: (id) =>
+      id === '\0licences'
+        ? `export default ${JSON.stringify([...licencesOfDecoder(), ...licencesOfPackages()])}`
+        : undefined,
+  };
 }
 
 /// Puts the script and the styles into the page, with a policy that lets nothing else run.
@@ -62,5 +109,5 @@ export default defineConfig({
     modulePreload: false,
     chunkSizeWarningLimit: 8192,
   },
-  plugins: [inline()],
+  plugins: [licences(), inline()],
 });

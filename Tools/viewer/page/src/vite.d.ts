@@ -4,3 +4,8 @@ declare module '*?worker&inline' {
 }
 
 declare module '*.css' {}
+
+declare module '#licences' {
+  const licences: { name: string; licence: string; text: string }[];
+  export default licences;
+}

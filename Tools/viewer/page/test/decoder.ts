@@ -31,6 +31,12 @@ export class Recording {
     }));
   }
 
+  readonly hidden: StreamSummary[] = [];
+
+  hiddenEntries(): Entries {
+    throw new ZulmError('nothing is hidden');
+  }
+
   entries(kind: string): Entries {
     return this.all.find((entries) => entries.kind === kind)!;
   }

@@ -34,12 +34,17 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
     const read = known ? attempt(kind, () => opened.entries(kind)) : undefined;
     if (read) entries.push(read);
   }
+  const hidden = opened.hidden.map((stream, index) => ({
+    stream: { ...stream },
+    entries: stream.known ? attempt(`hidden ${stream.kind}`, () => opened.hiddenEntries(index)) : undefined,
+  }));
   const decoded = {
     name,
     container: opened.container,
     duration: opened.duration,
     streams: opened.streams.map((stream) => ({ ...stream })),
     entries,
+    hidden,
     info: (reports && attempt('facts', () => opened.info())) || {},
     verify: (reports && attempt('check', () => opened.verify())) || {},
   };
@@ -47,9 +52,9 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
 }
 
 /// What can be handed over instead of copied.
-function transferable({ entries }: Decoded): ArrayBuffer[] {
+function transferable({ entries, hidden }: Decoded): ArrayBuffer[] {
   const buffers = new Set<ArrayBuffer>();
-  for (const { time, columns } of entries)
+  for (const { time, columns } of [...entries, ...hidden.flatMap(({ entries }) => entries ?? [])])
     for (const column of [time, ...Object.values(columns)])
       if (ArrayBuffer.isView(column) && column.buffer instanceof ArrayBuffer) buffers.add(column.buffer);
   return [...buffers];

@@ -2,7 +2,7 @@
 
 import { count, plural, titleOf } from '../model/format';
 import { partition } from '../model/search';
-import type { Session } from '../model/session';
+import type { HiddenStream, Session } from '../model/session';
 import { announce, byId, make, setText } from '../ui/dom';
 import { setIcon } from '../ui/icons';
 import { asCSV, asJSON, copyText } from './copy';
@@ -18,6 +18,7 @@ export interface EntriesEvents {
 }
 
 const mostCopied = 500_000;
+const hiddenPrefix = 'hidden:'; // no kind's name has a colon
 
 export class EntriesPane {
   private session: Session | undefined;
@@ -90,8 +91,11 @@ export class EntriesPane {
     const streams = session
       .allTracks()
       .map(({ kind, entries }) => option(kind, `${titleOf(kind)} (${count(entries.time.length)})`));
+    const hidden = session.hidden.flatMap(({ stream, track }, i) =>
+      track ? [option(hiddenPrefix + i, `${titleOf(stream.kind)}, hidden (${count(stream.entries)})`)] : [],
+    );
     const all = session.allTracks().reduce((sum, { count }) => sum + count, 0);
-    this.stream.replaceChildren(option('', `All streams (${count(all)})`), ...streams);
+    this.stream.replaceChildren(option('', `All streams (${count(all)})`), ...streams, ...hidden);
     this.query.value = '';
     this.choose('');
   }
@@ -103,7 +107,7 @@ export class EntriesPane {
 
   /// After the reader has asked for what was typed, or no longer.
   refresh(): void {
-    this.noteMask();
+    this.showNote();
     this.table.refresh();
     if (this.query.value) this.filter();
   }
@@ -117,20 +121,30 @@ export class EntriesPane {
   private choose(kind: string): void {
     const { session, events } = this;
     if (!session) return;
-    const track = session.track(kind);
+    const hidden = this.hiddenStream(kind);
+    const track = hidden ? hidden.track : session.track(kind);
     this.rows = track ? new StreamRows(track, events.showsKeys) : new AllRows(session.allTracks(), events.showsKeys);
     this.table.show(this.rows);
-    this.noteMask();
+    this.showNote();
     this.filter();
     const { time } = this;
     this.time = -1;
     this.setTime(Math.max(0, time));
   }
 
-  private noteMask(): void {
-    const kind = this.stream.value;
-    this.note.hidden = this.events.showsKeys() || kind !== 'keyboardAction';
-    setText(this.note, 'What was typed is masked, here and in copies. Press k to see it.');
+  private hiddenStream(choice: string): HiddenStream | undefined {
+    return choice.startsWith(hiddenPrefix) ? this.session?.hidden[Number(choice.slice(hiddenPrefix.length))] : undefined;
+  }
+
+  /// What the reader should know of the stream that is shown.
+  private showNote(): void {
+    const hidden = this.hiddenStream(this.stream.value);
+    const kind = hidden?.stream.kind ?? this.stream.value;
+    const notes = hidden ? [`No reader finds this stream. ${hidden.reason}`] : [];
+    if (!this.events.showsKeys() && kind === 'keyboardAction')
+      notes.push('What was typed is masked, here and in copies. Press k to see it.');
+    this.note.hidden = notes.length === 0;
+    setText(this.note, notes.join(' '));
   }
 
   private filter(): void {

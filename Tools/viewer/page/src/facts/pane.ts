@@ -1,5 +1,6 @@
 // What is known of a recording as a whole, and what is wrong with it.
 
+import type { StreamSummary } from '#decoder';
 import { brief, bytes, clock, count, plural, titleOf } from '../model/format';
 import { idleTime } from '../model/idle';
 import type { Finding, Session } from '../model/session';
@@ -23,7 +24,7 @@ export function showFacts(session: Session, duration: number): void {
     section('Activity', list(activityFacts(session))),
     ...optional('Made by', creatorFacts(session)),
     ...optional('Machine', machineFacts(session)),
-    section('Streams', streamTable(session)),
+    section('Streams', streamTable(session), ...hiddenNote(session)),
   );
 }
 
@@ -86,25 +87,36 @@ function machineFacts(session: Session): Fact[] {
   ]);
 }
 
-function streamTable({ streams }: Session): HTMLElement {
+function streamRow({ kind, uuid, entries, first, last, bytes: size, known }: StreamSummary, reason = ''): HTMLElement {
+  const time = (value: number | undefined) => (value === undefined ? '–' : clock(value, 2));
+  const cells = [known ? count(entries) : 'unknown', time(first), time(last), count(size)];
+  const name = make('th', { scope: 'row', title: reason || uuid }, titleOf(kind));
+  if (reason) name.append(' ', make('span', { class: 'tag' }, 'hidden'));
+  return make('tr', { class: reason ? 'is-hidden' : undefined }, name, ...cells.map((text) => make('td', {}, text)));
+}
+
+/// Hidden streams stand below all that readers find.
+function streamTable({ streams, hidden }: Session): HTMLElement {
   const head = make(
     'tr',
     {},
     ...['Stream', 'Entries', 'First', 'Last', 'Bytes'].map((title) => make('th', { scope: 'col' }, title)),
   );
-  const time = (value: number | undefined) => (value === undefined ? '–' : clock(value, 2));
-  const rows = streams.map(({ kind, uuid, entries, first, last, bytes: size, known }) =>
-    make(
-      'tr',
-      {},
-      make('th', { scope: 'row', title: uuid }, titleOf(kind)),
-      ...[known ? count(entries) : 'unknown', time(first), time(last), count(size)].map((text) => make('td', {}, text)),
-    ),
-  );
+  const rows = [
+    ...streams.map((stream) => streamRow(stream)),
+    ...hidden.map(({ stream, reason }) => streamRow(stream, reason)),
+  ];
   return make(
     'div',
     { class: 'table-scroll', tabindex: 0, role: 'group', 'aria-label': 'Streams' },
     make('table', {}, make('thead', {}, head), make('tbody', {}, ...rows)),
+  );
+}
+
+function hiddenNote({ hidden }: Session): Node[] {
+  if (hidden.length === 0) return [];
+  return [...new Set(hidden.map(({ reason }) => reason))].map((reason) =>
+    make('p', { class: 'quiet hidden-note' }, make('span', { class: 'tag' }, 'hidden'), ` No reader finds it. ${reason}`),
   );
 }
 
@@ -162,7 +174,8 @@ export function showCheck(session: Session): void {
   badge.textContent = String(findings.length);
 }
 
-function coverage({ streams }: Session): HTMLElement {
+function coverage(session: Session): HTMLElement {
+  const streams = [...session.streams, ...session.hidden.map(({ stream }) => stream)];
   const entries = streams.reduce((sum, stream) => sum + stream.entries, 0);
   return make(
     'p',

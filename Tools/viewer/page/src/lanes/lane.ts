@@ -8,6 +8,8 @@ import type { Extremes } from './extremes';
 
 export interface Lane {
   title: string;
+  /// Of a stream that no reader finds.
+  isHidden?: boolean;
   /// In pixels of the page.
   height: number;
   draw(canvas: LaneCanvas): void;

@@ -1,10 +1,11 @@
 // The lanes of a recording: one for each thing that was recorded.
 
 import { clickLabel, type Click } from '../model/clicks';
-import { brief } from '../model/format';
+import { StreamRows } from '../entries/rows';
+import { brief, titleOf } from '../model/format';
 import { keyLabel } from '../model/keys';
 import { countBefore, countUntil, lastAt } from '../model/search';
-import { rectAt, type Session } from '../model/session';
+import { rectAt, type HiddenStream, type Session } from '../model/session';
 import type { Track } from '../model/track';
 import { opacityAt } from '../stage/layers';
 import type { Palette } from '../ui/palette';
@@ -29,8 +30,27 @@ export function lanesOf(session: Session, options: LaneOptions): Lane[] {
     hoverLane(session),
     opacityLane(session),
     cpuLane(session),
+    ...session.hidden.slice(0, mostHidden).map((hidden) => hiddenLane(hidden, options)),
   ];
   return lanes.filter((lane): lane is Lane => lane !== undefined);
+}
+
+const mostHidden = 12;
+
+/// When a stream that no reader finds has entries.
+function hiddenLane({ stream, track }: HiddenStream, { showsKeys }: LaneOptions): Lane | undefined {
+  if (!track || track.count === 0) return undefined;
+  const rows = new StreamRows(track, showsKeys);
+  return {
+    title: titleOf(stream.kind),
+    isHidden: true,
+    height: 18,
+    draw: (canvas) => drawDensity(canvas, track.times, canvas.palette.faint),
+    valueAt: (time) => {
+      const index = track.at(time);
+      return index >= 0 ? rows.summary(track.row(index)) : '';
+    },
+  };
 }
 
 function filled(session: Session, kind: string): Track | undefined {

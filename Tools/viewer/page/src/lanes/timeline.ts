@@ -101,12 +101,12 @@ export class Timeline {
     this.lanes = lanesOf(session, this.events);
     this.values = this.lanes.map(() => make('span', { class: 'lane-value' }));
     this.labels.replaceChildren(
-      ...this.lanes.map(({ title, height }, i) => {
+      ...this.lanes.map(({ title, height, isHidden }, i) => {
         const label = make(
           'div',
           { class: 'lane-label' },
-          make('span', { class: 'lane-title' }, title),
-          this.values[i]!,
+          make('span', { class: 'lane-title', title }, title),
+          isHidden ? make('span', { class: 'tag' }, 'hidden') : this.values[i]!,
         );
         label.style.height = `${(height + laneGap) / 16}rem`;
         return label;

@@ -43,14 +43,24 @@ export interface Decoded {
   duration: number | undefined;
   streams: StreamSummary[];
   entries: Entries[];
+  hidden: { stream: StreamSummary; entries: Entries | undefined }[];
   info: FileInfo;
   verify: FileCheck;
+}
+
+/// A stream that no reader finds. Nothing of it is drawn over the movie, where readers would not draw it either.
+export interface HiddenStream {
+  stream: StreamSummary;
+  /// Undefined where its entries cannot be decoded.
+  track: Track | undefined;
+  reason: string;
 }
 
 export class Session {
   readonly name: string;
   readonly container: string;
   readonly streams: StreamSummary[];
+  readonly hidden: HiddenStream[];
   readonly info: FileInfo;
   readonly verify: FileCheck;
   readonly region: Rect | undefined;
@@ -73,6 +83,13 @@ export class Session {
     this.info = decoded.info;
     this.verify = decoded.verify;
     for (const entries of decoded.entries) this.tracks.set(entries.kind, new Track(entries));
+    this.hidden = decoded.hidden.map(({ stream, entries }) => ({
+      stream,
+      track: entries && new Track(entries),
+      reason: this.streams.some(({ uuid }) => uuid === stream.uuid)
+        ? 'A later stream of its kind takes its place.'
+        : 'It lies behind damage, where readers do not look.',
+    }));
     this.region = this.recordedRegion();
     this.scaleFactor = this.lastNumber('recordingScaleFactor', 'scaleFactor') ?? 1;
     this.duration = this.wholeDuration(decoded.duration);

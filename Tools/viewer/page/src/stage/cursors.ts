@@ -1,11 +1,13 @@
 // Cursor images, decoded when they are needed.
 
+import { bitmapOf } from '../images/client';
 import type { Appearance } from '../model/appearances';
 
 const atOnce = 8;
 
 export class CursorImages {
   private readonly images = new Map<Uint8Array, ImageBitmap | 'decoding' | 'failed'>();
+  private recording = 0;
   onDecoded: () => void = () => {};
 
   /// Undefined while it is being decoded, null where there is none that a browser can show.
@@ -19,19 +21,21 @@ export class CursorImages {
   /// So that they are there when they are needed.
   async prepare(appearances: Appearance[]): Promise<void> {
     const images = [...new Set(appearances.map(({ image }) => image))].filter(({ length }) => length > 0);
-    for (let i = 0; i < Math.min(images.length, 512); i += atOnce)
+    const { recording } = this;
+    for (let i = 0; i < Math.min(images.length, 512) && recording === this.recording; i += atOnce)
       await Promise.all(images.slice(i, i + atOnce).map((image) => this.images.has(image) || this.decode(image)));
   }
 
   clear(): void {
     for (const image of this.images.values()) if (image instanceof ImageBitmap) image.close();
     this.images.clear();
+    ++this.recording;
   }
 
   private async decode(bytes: Uint8Array): Promise<void> {
     this.images.set(bytes, 'decoding');
     try {
-      this.images.set(bytes, await createImageBitmap(new Blob([bytes as BlobPart])));
+      this.images.set(bytes, await bitmapOf(bytes));
     } catch {
       this.images.set(bytes, 'failed');
     }

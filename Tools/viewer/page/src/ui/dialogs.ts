@@ -1,5 +1,6 @@
 // Help, about and questions.
 
+import licences from '#licences';
 import { byId, make } from './dom';
 import { setIcon } from './icons';
 
@@ -81,31 +82,6 @@ function aboutContent(): Node[] {
     ),
   ];
 }
-
-const mitText = `Permission is hereby granted, free of charge, to any person obtaining a copy of this software and associated documentation files (the "Software"), to deal in the Software without restriction, including without limitation the rights to use, copy, modify, merge, publish, distribute, sublicense, and/or sell copies of the Software, and to permit persons to whom the Software is furnished to do so, subject to the following conditions:
-
-The above copyright notice and this permission notice shall be included in all copies or substantial portions of the Software.
-
-THE SOFTWARE IS PROVIDED "AS IS", WITHOUT WARRANTY OF ANY KIND, EXPRESS OR IMPLIED, INCLUDING BUT NOT LIMITED TO THE WARRANTIES OF MERCHANTABILITY, FITNESS FOR A PARTICULAR PURPOSE AND NONINFRINGEMENT. IN NO EVENT SHALL THE AUTHORS OR COPYRIGHT HOLDERS BE LIABLE FOR ANY CLAIM, DAMAGES OR OTHER LIABILITY, WHETHER IN AN ACTION OF CONTRACT, TORT OR OTHERWISE, ARISING FROM, OUT OF OR IN CONNECTION WITH THE SOFTWARE OR THE USE OR OTHER DEALINGS IN THE SOFTWARE.`;
-
-const licences = [
-  {
-    name: 'ZULMetaData',
-    licence: 'all rights reserved',
-    text: 'No licence has been chosen yet: all rights stay with the owner.',
-  },
-  { name: 'JSON for Modern C++', licence: 'MIT', text: `Copyright (c) 2013-2022 Niels Lohmann\n\n${mitText}` },
-  {
-    name: '{fmt}',
-    licence: 'MIT, with an exception for object form',
-    text: `Copyright (c) 2012 - present, Victor Zverovich and {fmt} contributors\n\n${mitText}\n\n--- Optional exception to the license ---\n\nAs an exception, if, as a result of your compiling your source code, portions of this Software are embedded into a machine-executable object form of such source code, you may redistribute such embedded portions in such object form without including the above copyright and permission notices.`,
-  },
-  {
-    name: 'Emscripten runtime, musl and LLVM libc++',
-    licence: 'MIT; Apache 2.0 with LLVM exceptions',
-    text: `Copyright (c) 2010-2022 Emscripten authors\nCopyright (c) 2005-2020 Rich Felker, et al. (musl)\nCopyright (c) 2009-2022 the LLVM contributors (libc++, libc++abi; Apache License 2.0 with LLVM Exceptions, or MIT)\n\n${mitText}`,
-  },
-];
 
 export function setUpDialogs(): void {
   const help = byId<HTMLDialogElement>('help-dialog');
