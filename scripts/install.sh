@@ -8,6 +8,9 @@ build=(g++ cmake ninja-build ccache libpng-dev libtiff-dev libcli11-dev nlohmann
 media=(ffmpeg)
 test=(libgtest-dev libgmock-dev imagemagick pngcheck libimage-exiftool-perl mediainfo groff-base python3-jsonschema zsh fish)
 consumers=(clang make pkg-config binutils)
+python=(python3-dev python3-numpy python3-pybind11 pybind11-dev python3-pip python3-setuptools python3-wheel python3-pytest
+    python3-matplotlib mypy)
+docs=(doxygen python3 python3-markdown)
 check=(clang clang-format git)
 lint=(clang clang-format clang-tidy cppcheck shellcheck codespell git python3)
 package=(dpkg-dev file mmdebstrap)

@@ -16,3 +16,18 @@ if(ZULM_VIEWER)
     set_tests_properties(JavaScript/${test} PROPERTIES TIMEOUT 300)
   endforeach()
 endif()
+
+# The package for Python, where it is built.
+if(ZULMETADATA_PYTHON)
+  add_test(NAME Bindings/Python
+    COMMAND ${CMAKE_COMMAND} -E env PYTHONPATH=${ZULMETADATA_PYTHON_PACKAGE} PYTHONDONTWRITEBYTECODE=1
+      ${Python_EXECUTABLE} -m pytest -q -p no:cacheprovider ${CMAKE_CURRENT_SOURCE_DIR}/Bindings/Python)
+  set_tests_properties(Bindings/Python PROPERTIES TIMEOUT 300)
+endif()
+if(ZULMETADATA_PYTHON AND ZULMETADATA_TEST_CONSUMERS)
+  add_test(NAME Consumers/wheel COMMAND ${CMAKE_COMMAND} -DPYTHON=${Python_EXECUTABLE}
+    -DSOURCE=${PROJECT_SOURCE_DIR}/Bindings/Python -DFOLDER=${PROJECT_BINARY_DIR}/consumers/wheel
+    -DLAUNCHER=${CMAKE_CXX_COMPILER_LAUNCHER} -DGENERATOR=${CMAKE_GENERATOR} -DVERSION=${PROJECT_VERSION}
+    -P ${CMAKE_CURRENT_SOURCE_DIR}/Bindings/Python/Wheel.cmake)
+  set_tests_properties(Consumers/wheel PROPERTIES LABELS consumers)
+endif()

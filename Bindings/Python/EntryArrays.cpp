@@ -1,0 +1,186 @@
+#include "Bindings/Python/EntryArrays.h"
+
+#include "ZULMetaData/StreamEntries.h"
+#include "ZULMetaData/ZULMMetaDataWriter.h"
+#include "ZULMetaDataBridge/Source/KindEntries.h"
+
+#include <algorithm>
+#include <iterator>
+#include <memory>
+#include <tuple>
+#include <utility>
+#include <vector>
+
+namespace ZULMetaData::Python {
+
+namespace {
+
+template <class Value>
+constexpr const char* numberFormat() {
+    if constexpr (std::is_same_v<Value, std::int32_t>)
+        return "<i4";
+    else if constexpr (std::is_same_v<Value, std::uint32_t>)
+        return "<u4";
+    else if constexpr (std::is_same_v<Value, float>)
+        return "<f4";
+    else if constexpr (std::is_same_v<Value, double>)
+        return "<f8";
+    else
+        return nullptr; // a text, which only the kind's own entries are made of
+}
+
+template <class Kind>
+void addFields(py::list& fields) {
+    const auto add = [&fields]<class Projection>(const Field<Projection>& field) {
+        using Result = std::decay_t<std::invoke_result_t<Projection, const typename Kind::Value&>>;
+        if constexpr (!FixedSizeValue<typename Kind::Value>)
+            fields.append(py::make_tuple(field.key, "O"));
+        else if constexpr (numberFormat<Result>() != nullptr)
+            fields.append(py::make_tuple(field.key, numberFormat<Result>()));
+    };
+    std::apply([&add](const auto&... field) { (add(field), ...); }, Kind::fields);
+}
+
+template <>
+void addFields<CursorImageKind>(py::list& fields) {
+    fields.append(py::make_tuple("id", "<u8"));
+    fields.append(py::make_tuple("hotspotOffsetX", "<i4"));
+    fields.append(py::make_tuple("hotspotOffsetY", "<i4"));
+    fields.append(py::make_tuple("cursorTypeId", "<i4"));
+    fields.append(py::make_tuple("flags", "<u4"));
+    fields.append(py::make_tuple("image", "O"));
+}
+
+template <class Kind>
+py::dtype entryType() {
+    py::list fields;
+    fields.append(py::make_tuple("time", "<f8"));
+    addFields<Kind>(fields);
+    return py::dtype::from_args(fields);
+}
+
+py::object pythonText(const std::string& bytes) {
+    const std::size_t length = std::min(bytes.find('\0'), bytes.size());
+    PyObject* text = PyUnicode_DecodeUTF8(bytes.data(), static_cast<py::ssize_t>(length), "surrogateescape");
+    if (!text)
+        throw py::error_already_set();
+    return py::reinterpret_steal<py::object>(text);
+}
+
+/// The stored bytes themselves, in memory that the array owns.
+template <class Kind>
+py::array arrayOverStream(const StreamSource::Bytes& stream) {
+    constexpr std::size_t entrySize = sizeof(double) + sizeof(typename Kind::Value);
+    std::unique_ptr<char[]> bytes;
+    std::size_t count = 0;
+    {
+        const py::gil_scoped_release others;
+        const std::uint64_t body = stream.length - std::min<std::uint64_t>(stream.length, s_metaDataHeaderSize);
+        const std::size_t whole = static_cast<std::size_t>(body / entrySize) * entrySize;
+        bytes.reset(new char[whole]);
+        count = stream.read(s_metaDataHeaderSize, {bytes.get(), whole}) / entrySize;
+    }
+    const char* data = bytes.get();
+    const py::capsule owner(bytes.release(), [](void* memory) { delete[] static_cast<char*>(memory); });
+    const py::dtype type = entryType<Kind>();
+    if (static_cast<std::size_t>(type.itemsize()) != entrySize)
+        throw std::logic_error("a record is not what an entry is");
+    return {type, {count}, {entrySize}, data, owner};
+}
+
+template <class Value>
+std::vector<TimedValue<Value>> decodeAll(const StreamSource::Bytes& stream) {
+    const py::gil_scoped_release others;
+    std::vector<TimedValue<Value>> decoded;
+    StreamEntries entries = entriesOf(stream.read, stream.length);
+    while (const auto entry = entries.next())
+        if (auto fitting = decodeEntry<Value>(entries.bytesOf(*entry), entries.header()->version))
+            decoded.push_back(std::move(*fitting));
+    return decoded;
+}
+
+/// Moves one field of all entries into its column.
+template <class Value, class ValueOf>
+void fillColumn(py::array& array, const char* name, const std::vector<TimedValue<Value>>& entries, ValueOf valueOf) {
+    py::list column(entries.size());
+    for (std::size_t i = 0; i < entries.size(); ++i)
+        column[i] = valueOf(entries[i].value);
+    array[py::str(name)] = column;
+}
+
+void fillColumns(py::array& array, const std::vector<TimedValue<std::string>>& entries) {
+    const py::object name = array.dtype().attr("names")[py::int_(1)];
+    fillColumn(array, name.cast<std::string>().c_str(), entries, pythonText);
+}
+
+/// A text that an entry lacks is None.
+void fillColumns(py::array& array, const std::vector<TimedValue<std::list<std::string>>>& entries) {
+    const py::tuple names = array.dtype().attr("names");
+    for (std::size_t column = 1; column < names.size(); ++column)
+        fillColumn(array, names[column].cast<std::string>().c_str(), entries,
+                   [column](const std::list<std::string>& texts) -> py::object {
+                       if (texts.size() < column)
+                           return py::none();
+                       return pythonText(*std::next(texts.begin(), static_cast<std::ptrdiff_t>(column) - 1));
+                   });
+}
+
+void fillColumns(py::array& array, const std::vector<TimedValue<CursorImage>>& entries) {
+    const auto field = [&](const char* name, auto valueOf) { fillColumn(array, name, entries, valueOf); };
+    field("id", [](const CursorImage& cursor) { return py::int_(cursor.uniqueId); });
+    field("hotspotOffsetX", [](const CursorImage& cursor) { return py::int_(cursor.hotspotOffsetX); });
+    field("hotspotOffsetY", [](const CursorImage& cursor) { return py::int_(cursor.hotspotOffsetY); });
+    field("cursorTypeId", [](const CursorImage& cursor) { return py::int_(static_cast<int>(cursor.cursorTypeId)); });
+    field("flags", [](const CursorImage& cursor) { return py::int_(static_cast<std::uint32_t>(cursor.flags)); });
+    field("image", [](const CursorImage& cursor) -> py::object {
+        if (!cursor.imageData || cursor.imageDataSize == 0)
+            return py::none();
+        return py::bytes(reinterpret_cast<const char*>(cursor.imageData), cursor.imageDataSize);
+    });
+}
+
+template <class Kind>
+py::array entriesOfKind(const StreamSource::Bytes& stream) {
+    using Value = typename Kind::Value;
+    if constexpr (FixedSizeValue<Value>) {
+        return arrayOverStream<Kind>(stream);
+    } else {
+        const std::vector<TimedValue<Value>> entries = decodeAll<Value>(stream);
+        py::array array(entryType<Kind>(), static_cast<py::ssize_t>(entries.size()));
+        py::array_t<double> times(static_cast<py::ssize_t>(entries.size()));
+        std::transform(entries.begin(), entries.end(), times.mutable_data(),
+                       [](const TimedValue<Value>& entry) { return entry.time; });
+        array[py::str("time")] = times;
+        fillColumns(array, entries);
+        return array;
+    }
+}
+
+} // namespace
+
+const MetaDataKind& kindNamed(const std::string& name) {
+    const auto found = std::find_if(s_metaDataKinds.begin(), s_metaDataKinds.end(), [&name](const MetaDataKind& kind) {
+        return kind.name == name && RecordedKinds::visit(kind.type, []<class Kind>() {});
+    });
+    if (found == s_metaDataKinds.end())
+        throw py::key_error(name);
+    return *found;
+}
+
+py::dtype typeOfEntries(const uuid& kind) {
+    py::dtype type = py::dtype::of<double>();
+    RecordedKinds::visit(kind, [&type]<class Kind>() { type = entryType<Kind>(); });
+    return type;
+}
+
+py::array readEntries(const StreamSource& source) {
+    const StreamSource::Bytes stream = source.open();
+    const std::optional<MetaDataHeader> header = StreamEntries(stream.read, stream.length).header();
+    if (!header || !isDecodable(*header))
+        throw py::value_error(source.name() + ": a stream of a version that this library does not know");
+    py::array array;
+    RecordedKinds::visit(header->uuid, [&]<class Kind>() { array = entriesOfKind<Kind>(stream); });
+    return array;
+}
+
+} // namespace ZULMetaData::Python

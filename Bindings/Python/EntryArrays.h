@@ -1,0 +1,29 @@
+#pragma once
+
+// The entries of a stream as one NumPy array: a record for each, its fields named as the keys of an `EntryDictionary`.
+
+#include "ZULMetaDataBridge/Source/MetaDataKinds.h"
+#include "ZULMetaDataBridge/Source/StreamSource.h"
+
+#include <pybind11/numpy.h>
+#include <pybind11/pybind11.h>
+
+#include <string>
+
+namespace ZULMetaData::Python {
+
+namespace py = pybind11;
+
+/// Throws `KeyError` for a name that no recorded kind has.
+const MetaDataKind& kindNamed(const std::string& name);
+
+/// "time" and the stored fields, in the order in which they are stored; texts and images are objects. A record of
+/// numbers lies in memory as its entry does in the stream.
+py::dtype typeOfEntries(const uuid& kind);
+
+/// Every whole entry that fits the kind. Numbers stay where they were read to, in memory that the array keeps; texts
+/// end in front of their first zero byte, and of their other bytes those that are not UTF-8 become lone surrogates.
+/// Throws `ValueError` for a stream whose version is not known.
+py::array readEntries(const StreamSource& stream);
+
+} // namespace ZULMetaData::Python

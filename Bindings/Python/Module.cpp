@@ -1,0 +1,343 @@
+// zulmetadata._core: what the package in zulmetadata/ is built on. Its types are described in _core.pyi.
+
+#include "Bindings/Python/EntryArrays.h"
+#include "Bindings/Python/StreamWriter.h"
+#include "ZULMetaData/MovieDuration.h"
+#include "ZULMetaData/RecordingInfo.h"
+#include "ZULMetaDataBridge/Source/HumanReadableActions.h"
+#include "ZULMetaDataBridge/Source/KindEntries.h"
+#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaDataBridge/Source/SafeMovieSave.h"
+
+#include <pybind11/numpy.h>
+#include <pybind11/pybind11.h>
+#include <pybind11/stl.h>
+#include <pybind11/stl/filesystem.h>
+
+#include <cerrno>
+#include <fstream>
+#include <optional>
+#include <sstream>
+#include <system_error>
+#include <utility>
+
+namespace ZULMetaData::Python {
+
+namespace {
+
+std::string textOf(const uuid& type) {
+    std::ostringstream text;
+    text << type;
+    return text.str();
+}
+
+std::string nameOf(const uuid& type) {
+    const MetaDataKind* kind = findMetaDataKind(type);
+    return kind ? std::string(kind->name) : textOf(type);
+}
+
+/// Throws `OSError` for a file that cannot be opened, `ValueError` where its name tells no container.
+std::unique_ptr<MetaDataParser> openRecording(const FileLocation& file) {
+    const std::string path = utf8Path(file);
+    errno = 0;
+    std::ifstream stream;
+    fileOpen(stream, path.c_str(), std::ios_base::binary);
+    if (!stream.is_open())
+        throw std::system_error(errno, std::generic_category(), path);
+    if (MetaDataParser::streamTypeOf(path) == MetaDataParser::Unknown)
+        throw py::value_error(path + ": neither a movie nor a RIFF file nor a stream file, by its name");
+    auto parser = MetaDataParser::create(path);
+    if (!parser)
+        throw std::system_error(errno != 0 ? errno : EIO, std::generic_category(), path);
+    requireReadable(parser->getStream());
+    return parser;
+}
+
+/// A stream of a recording, found when the recording was opened.
+struct RecordedStream {
+    FileLocation file;
+    uuid type{};
+    MetaDataHeader header;
+    std::uint64_t offset = 0;
+    std::uint64_t bytes = 0; ///< header included, as the container declares
+
+    StreamSource source() const { return StreamSource::part(file, offset, bytes); }
+};
+
+class RecordingFile {
+public:
+    explicit RecordingFile(const FileLocation& file) {
+        const auto parser = openRecording(file);
+        container_ = parser->getStreamType();
+        duration_ = movieDuration(*parser);
+        for (const ZCAPHeader& info : readRecordingInfo(*parser))
+            creators_.push_back(info.creator);
+        for (const uuid& type : parser->getAvailableMetaDataUUIDs()) {
+            const auto place = parser->fileDataForUUID(type);
+            RecordedStream stream{file, type, {}, place.offset, place.length};
+            const StreamSource::Bytes bytes = stream.source().open();
+            if (const auto header = StreamEntries(bytes.read, bytes.length).header())
+                stream.header = *header;
+            streams_.push_back(stream);
+        }
+    }
+
+    std::string container() const {
+        return container_ == MetaDataParser::QuickTime ? "movie"
+               : container_ == MetaDataParser::Riff    ? "riff"
+                                                       : "stream";
+    }
+    std::optional<double> duration() const { return duration_; }
+    const std::vector<CreatorAttributes>& creators() const { return creators_; }
+    const std::vector<RecordedStream>& streams() const { return streams_; }
+
+private:
+    MetaDataParser::StreamType container_ = MetaDataParser::Unknown;
+    std::optional<double> duration_;
+    std::vector<CreatorAttributes> creators_;
+    std::vector<RecordedStream> streams_;
+};
+
+py::bytes bytesOf(const RecordedStream& stream) {
+    std::string bytes;
+    {
+        const py::gil_scoped_release others;
+        const StreamSource::Bytes opened = stream.source().open();
+        bytes.resize(static_cast<std::size_t>(opened.length));
+        bytes.resize(opened.read(0, bytes));
+    }
+    return {bytes};
+}
+
+/// Stream files, and streams of other recordings.
+std::vector<StreamSource> sourcesOf(const py::iterable& streams) {
+    std::vector<StreamSource> sources;
+    for (const py::handle stream : streams)
+        if (py::isinstance<RecordedStream>(stream))
+            sources.push_back(stream.cast<RecordedStream>().source());
+        else
+            sources.push_back(StreamSource::file(stream.cast<FileLocation>()));
+    return sources;
+}
+
+AttachResult attach(const FileLocation& movie, const py::iterable& streams, bool replace) {
+    const std::vector<StreamSource> sources = sourcesOf(streams);
+    const py::gil_scoped_release others;
+    return SafeMovieSave(movie).attach(sources,
+                                       replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse);
+}
+
+StampResult stamp(const FileLocation& movie, const std::string& creator, const std::string& version) {
+    return SafeMovieSave(movie).stamp(creator, version);
+}
+
+RepairPlan repair(const FileLocation& movie, bool dryRun) {
+    return dryRun ? SafeMovieSave(movie).plan() : SafeMovieSave(movie).repair();
+}
+
+ValidationReport verify(const FileLocation& file) {
+    (void)openRecording(file); // tells what is wrong with a file that cannot be opened
+    const py::gil_scoped_release others;
+    return validateRecording(file);
+}
+
+const char* stateOf(const RepairPlan& plan) {
+    return plan.state == RepairPlan::Whole        ? "whole"
+           : plan.state == RepairPlan::Repairable ? "repairable"
+                                                  : "unrepairable";
+}
+
+const char* reasonOf(const SaveError& error) {
+    switch (error.reason()) {
+    case SaveError::Reason::Failed: return "failed";
+    case SaveError::Reason::KindExists: return "kind-exists";
+    case SaveError::Reason::NotUndone: break;
+    }
+    return "not-undone";
+}
+
+void setSaveError(const py::handle& type, const SaveError& error) {
+    const py::object exception = type(error.what());
+    exception.attr("file") = error.file();
+    exception.attr("sentence") = error.sentence();
+    exception.attr("reason") = reasonOf(error);
+    PyErr_SetObject(type.ptr(), exception.ptr());
+}
+
+void setOSError(const std::system_error& error) {
+    const std::string sentence = error.what();
+    const std::string end = ": " + error.code().message();
+    const bool hasFile = sentence.ends_with(end); // its name stands in front of the system's words
+    const py::object arguments = hasFile ? py::make_tuple(error.code().value(), error.code().message(),
+                                                          sentence.substr(0, sentence.size() - end.size()))
+                                         : py::make_tuple(error.code().value(), sentence);
+    PyErr_SetObject(PyExc_OSError, arguments.ptr());
+}
+
+void addErrors(py::module_& module) {
+    static const py::handle saveError = PyErr_NewExceptionWithDoc(
+        "zulmetadata.SaveError",
+        "A movie was not changed as it should. `file` and `sentence` say which and why; `reason` is 'failed' where\n"
+        "the movie is what it was, 'kind-exists' where it has a stream of that kind already, and 'not-undone' where\n"
+        "the movie could not be made what it was.",
+        PyExc_RuntimeError, nullptr);
+    module.attr("SaveError") = saveError;
+    py::register_exception_translator([](std::exception_ptr thrown) {
+        try {
+            if (thrown)
+                std::rethrow_exception(std::move(thrown));
+        } catch (const SaveError& error) {
+            setSaveError(saveError, error);
+        } catch (const std::system_error& error) {
+            setOSError(error);
+        }
+    });
+}
+
+/// A key without a name is the character of its low 8 bits.
+py::str keyText(std::uint32_t code) {
+    const std::string text = HumanReadableActions::KeyboardActionCodeToString(static_cast<std::int32_t>(code));
+    return py::reinterpret_steal<py::str>(
+        PyUnicode_DecodeLatin1(text.data(), static_cast<py::ssize_t>(text.size()), nullptr));
+}
+
+void addReading(py::module_& module) {
+    py::class_<RecordedStream>(module, "RecordedStream",
+                               "A stream of a recording: where it is, and what it says of itself.")
+        .def_property_readonly(
+            "kind", [](const RecordedStream& stream) { return nameOf(stream.type); },
+            "The name of its kind, or its UUID where that has none.")
+        .def_property_readonly("uuid", [](const RecordedStream& stream) { return textOf(stream.type); })
+        .def_property_readonly("version", [](const RecordedStream& stream) { return stream.header.version; })
+        .def_readonly("offset", &RecordedStream::offset, "Of its header in the file.")
+        .def_readonly("bytes", &RecordedStream::bytes, "Header included, as the container declares.")
+        .def_property_readonly(
+            "is_decodable", [](const RecordedStream& stream) { return isDecodable(stream.header); },
+            "Whether `read` knows its kind and version.")
+        .def(
+            "read", [](const RecordedStream& stream) { return readEntries(stream.source()); },
+            "Its whole entries, as a NumPy array of records.")
+        .def("raw", bytesOf, "Its bytes, header included.");
+    py::class_<RecordingFile>(module, "RecordingFile")
+        .def(py::init<const FileLocation&>(), py::arg("path"))
+        .def_property_readonly("container", &RecordingFile::container)
+        .def_property_readonly("duration", &RecordingFile::duration)
+        .def_property_readonly("creators", &RecordingFile::creators)
+        .def_property_readonly("streams", &RecordingFile::streams);
+    py::class_<CreatorAttributes>(module, "Creator",
+                                  "Who stamped a movie: the platform's name, a version, the system's version.")
+        .def_property_readonly("name", &CreatorAttributes::name)
+        .def_property_readonly("version", &CreatorAttributes::version)
+        .def_property_readonly("platform_version", &CreatorAttributes::platformVersion);
+    module.def(
+        "dtype_of", [](const std::string& kind) { return typeOfEntries(kindNamed(kind).type); }, py::arg("kind"),
+        "The fields of an entry of this kind. `KeyError` for a kind without entries of its own.");
+    module.def(
+        "recorded_kinds",
+        [] {
+            std::vector<std::string> names;
+            RecordedKinds::forEach([&names]<class Kind>() { names.push_back(nameOf(Kind::type)); });
+            return names;
+        },
+        "The names of all kinds that have entries.");
+    module.def("action_text", &HumanReadableActions::CursorActionToString, py::arg("action"),
+               "\"left down + shift\" and so on, for \"rawActionValue\" of cursorAction.");
+    module.def("key_text", keyText, py::arg("code"), "The name of a key, for \"characterCode\" of keyboardAction.");
+    module.def(
+        "modifiers_text",
+        [](std::uint32_t flags) {
+            return HumanReadableActions::KeyboardModifiersToString(static_cast<std::int32_t>(flags));
+        },
+        py::arg("flags"), "\"<Shift><Cmd>\" and so on, for \"eventFlagsCode\" of keyboardAction.");
+}
+
+void addWriting(py::module_& module) {
+    py::class_<StreamWriter>(module, "StreamWriterFile")
+        .def(py::init([](const FileLocation& file, const std::string& kind) {
+                 return StreamWriter::create(file, kindNamed(kind));
+             }),
+             py::arg("path"), py::arg("kind"))
+        .def("extend", &StreamWriter::extend, py::arg("entries"))
+        .def("flush", &StreamWriter::flush)
+        .def("close", &StreamWriter::close)
+        .def_property_readonly("closed", &StreamWriter::isClosed)
+        .def_property_readonly("entries_written", &StreamWriter::entriesWritten);
+}
+
+void addSaving(py::module_& module) {
+    py::class_<RepairChange>(module, "RepairChange", "Bytes of a movie that a repair replaces.")
+        .def_readonly("offset", &RepairChange::offset)
+        .def_property_readonly("before", [](const RepairChange& change) { return py::bytes(change.before); })
+        .def_property_readonly(
+            "after", [](const RepairChange& change) { return py::bytes(change.after); },
+            "Empty where the file's last bytes are cut off.")
+        .def_readonly("reason", &RepairChange::reason);
+    py::class_<RepairPlan>(module, "Repair", "What is wrong with a movie's atoms, and what mends it.")
+        .def_property_readonly("state", stateOf, "'whole', 'repairable' or 'unrepairable'.")
+        .def_readonly("changes", &RepairPlan::changes)
+        .def_readonly("finding", &RepairPlan::finding, "What is wrong, in one sentence; empty where nothing is.")
+        .def_readonly("offset", &RepairPlan::offset, "Of the atom that is wrong.")
+        .def_readonly("has_loss", &RepairPlan::hasLoss, "Part of an interrupted append never got into the movie.");
+    py::class_<AttachedStream>(module, "AttachedStream", "What became of one stream that was attached.")
+        .def_readonly("name", &AttachedStream::name, "Of its source.")
+        .def_property_readonly("kind", [](const AttachedStream& stream) { return nameOf(stream.type); })
+        .def_readonly("offset", &AttachedStream::offset, "Of its header in the movie.")
+        .def_readonly("bytes", &AttachedStream::bytes, "Header and whole entries.")
+        .def_readonly("entries", &AttachedStream::entries)
+        .def_readonly("bytes_cut", &AttachedStream::bytesCut, "What stood behind its last whole entry.");
+    py::class_<AttachResult>(module, "Attached", "What `attach` did.")
+        .def_readonly("repair", &AttachResult::repair, "What was done before.")
+        .def_readonly("streams", &AttachResult::streams);
+    module.def("attach", attach, py::arg("movie"), py::arg("streams"), py::arg("replace"));
+    module.def(
+        "stamp",
+        [](const FileLocation& movie, const std::string& creator, const std::string& version) {
+            return stamp(movie, creator, version).info.creator;
+        },
+        py::arg("movie"), py::arg("creator"), py::arg("version"), py::call_guard<py::gil_scoped_release>());
+    module.def("repair", repair, py::arg("movie"), py::arg("dry_run"), py::call_guard<py::gil_scoped_release>());
+}
+
+void addVerifying(py::module_& module) {
+    py::class_<Finding>(module, "Finding", "Something that `verify` found.")
+        .def_property_readonly(
+            "code", [](const Finding& finding) { return ruleOf(finding.code).name; },
+            "Such as 'torn-entry'; the same for every finding of the sort.")
+        .def_property_readonly(
+            "is_damage", [](const Finding& finding) { return finding.severity() == Severity::Damage; },
+            "Whether something is lost, cannot be reached, or contradicts itself.")
+        .def_readonly("place", &Finding::place, "The kind of the stream, or the type of the atom.")
+        .def_readonly("offset", &Finding::offset, "In the file.")
+        .def_readonly("sentence", &Finding::sentence)
+        .def("__str__", [](const Finding& finding) {
+            return finding.place + " at offset " + std::to_string(finding.offset) + ": " + finding.sentence;
+        });
+    py::class_<StreamReport>(module, "StreamReport", "What `verify` saw of one stream.")
+        .def_property_readonly("kind", &StreamReport::name)
+        .def_readonly("version", &StreamReport::version)
+        .def_readonly("offset", &StreamReport::offset)
+        .def_readonly("entries", &StreamReport::wholeEntries, "That are whole and fit their own sizes.")
+        .def_readonly("first_time", &StreamReport::firstTime)
+        .def_readonly("last_time", &StreamReport::lastTime)
+        .def_readonly("is_reachable", &StreamReport::isReachable, "Whether readers find it.");
+    py::class_<ValidationReport>(module, "Report", "What `verify` says of a file.")
+        .def_readonly("bytes", &ValidationReport::bytes)
+        .def_readonly("streams", &ValidationReport::streams)
+        .def_property_readonly("findings", &ValidationReport::allFindings, "In the order of their offsets.")
+        .def_property_readonly("is_damaged", &ValidationReport::isDamaged)
+        .def_property_readonly("has_metadata", &ValidationReport::hasMetaData);
+    module.def("verify", verify, py::arg("path"));
+}
+
+} // namespace
+
+PYBIND11_MODULE(_core, module) {
+    module.attr("__version__") = ZULMETADATA_VERSION;
+    addErrors(module);
+    addReading(module);
+    addWriting(module);
+    addSaving(module);
+    addVerifying(module);
+}
+
+} // namespace ZULMetaData::Python

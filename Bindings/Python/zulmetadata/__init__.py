@@ -1,0 +1,209 @@
+"""The metadata of screen recordings, as NumPy arrays.
+
+    import zulmetadata
+
+    recording = zulmetadata.Recording("Recording.mp4")
+    cursor = recording["cursorLocation"]        # a NumPy array of records
+    print(len(cursor), cursor["time"][0], cursor["x"].max())
+
+A file is read as it was when the `Recording` was made. What goes wrong with a file is an `OSError`, what is wrong with
+an argument a `ValueError`, `TypeError` or `KeyError`; a movie that could not be changed is a `SaveError`.
+"""
+
+from __future__ import annotations
+
+import os
+import warnings
+from collections.abc import Iterable, Iterator, Mapping
+from types import TracebackType
+from typing import Any, Union
+
+import numpy as np
+import numpy.typing as npt
+
+from . import _core
+from ._core import (
+    Attached,
+    AttachedStream,
+    Creator,
+    Finding,
+    RecordedStream,
+    Repair,
+    RepairChange,
+    Report,
+    SaveError,
+    StreamReport,
+    __version__,
+    action_text,
+    dtype_of,
+    key_text,
+    modifiers_text,
+    recorded_kinds,
+    verify,
+)
+
+__all__ = [
+    "Attached",
+    "AttachedStream",
+    "Creator",
+    "Finding",
+    "RecordedStream",
+    "Recording",
+    "Repair",
+    "RepairChange",
+    "Report",
+    "SaveError",
+    "StreamReport",
+    "StreamWriter",
+    "__version__",
+    "action_text",
+    "attach",
+    "dtype_of",
+    "key_text",
+    "modifiers_text",
+    "recorded_kinds",
+    "repair",
+    "stamp",
+    "verify",
+    "write_stream",
+]
+
+Path = Union[str, "os.PathLike[str]"]
+Entries = npt.NDArray[Any]
+
+
+def _records(entries: npt.ArrayLike, fields: np.dtype[Any]) -> Entries:
+    with warnings.catch_warnings():
+        warnings.simplefilter("error", DeprecationWarning)  # of an integer out of range, which NumPy 2 refuses itself
+        try:
+            return np.ascontiguousarray(entries, fields)
+        except DeprecationWarning as warning:
+            raise OverflowError(str(warning)) from None
+
+
+class Recording(Mapping[str, Entries]):
+    """A movie, RIFF file or stream file: the entries of each stream by the name of its kind.
+
+    Entries are read anew each time they are asked for, and are the caller's. Only streams that can be decoded are in
+    the mapping; `streams` has all of them.
+    """
+
+    def __init__(self, path: Path) -> None:
+        self._file = _core.RecordingFile(os.fspath(path))
+        self._decodable = {stream.kind: stream for stream in self._file.streams if stream.is_decodable}
+        self.path = path
+
+    @property
+    def container(self) -> str:
+        """'movie', 'riff' or 'stream'."""
+        return self._file.container
+
+    @property
+    def duration(self) -> float | None:
+        """Seconds, as the movie declares them; None where it does not."""
+        return self._file.duration
+
+    @property
+    def creators(self) -> list[Creator]:
+        """Who stamped the movie, in the order of the file: the last one was stamped last."""
+        return self._file.creators
+
+    @property
+    def streams(self) -> list[RecordedStream]:
+        """Every stream, decodable or not, in the order of their identifiers."""
+        return self._file.streams
+
+    def __getitem__(self, kind: str) -> Entries:
+        return self._decodable[kind].read()
+
+    def __contains__(self, kind: object) -> bool:
+        return kind in self._decodable
+
+    def __iter__(self) -> Iterator[str]:
+        return iter(self._decodable)
+
+    def __len__(self) -> int:
+        return len(self._decodable)
+
+    def __repr__(self) -> str:
+        return f"<{self.container} {os.fspath(self.path)!r}: {', '.join(self) or 'no metadata'}>"
+
+
+class StreamWriter:
+    """Writes a stream file, entry by entry; close it, or use it in a `with`.
+
+        with StreamWriter("cursorLocation.dat", "cursorLocation") as writer:
+            writer.append(0.25, 640, 360)
+
+    The values of an entry are those of `dtype_of(kind)`, behind the time. Entries wait in a buffer until `flush`; what
+    the disk does not take is an `OSError`.
+    """
+
+    def __init__(self, path: Path, kind: str) -> None:
+        self._type = dtype_of(kind)
+        self._file = _core.StreamWriterFile(os.fspath(path), kind)
+
+    def append(self, time: float, *values: Any) -> None:
+        """Writes one entry."""
+        if self._type.names is None or len(values) != len(self._type.names) - 1:
+            raise TypeError(f"the values of an entry are {', '.join((self._type.names or ())[1:])}")
+        self._file.extend(_records([(time, *values)], self._type))
+
+    def extend(self, entries: npt.ArrayLike) -> None:
+        """Writes many entries: a sequence of tuples, or an array of records, which NumPy converts to the kind's."""
+        self._file.extend(_records(entries, self._type))
+
+    def flush(self) -> None:
+        """Hands what was written to the system."""
+        self._file.flush()
+
+    def close(self) -> None:
+        """Ends the file. May be called more than once."""
+        self._file.close()
+
+    @property
+    def closed(self) -> bool:
+        return self._file.closed
+
+    @property
+    def entries_written(self) -> int:
+        return self._file.entries_written
+
+    def __enter__(self) -> StreamWriter:
+        return self
+
+    def __exit__(
+        self, kind: type[BaseException] | None, error: BaseException | None, trace: TracebackType | None
+    ) -> None:
+        self.close()
+
+
+def write_stream(path: Path, kind: str, entries: npt.ArrayLike) -> None:
+    """Writes a whole stream file."""
+    with StreamWriter(path, kind) as writer:
+        writer.extend(entries)
+
+
+def attach(movie: Path, streams: Iterable[Path | RecordedStream | Recording], *, replace: bool = False) -> Attached:
+    """Puts streams into a movie: stream files, single streams of other recordings, or all of a recording's.
+
+    The movie holds them all afterwards, or is byte for byte what it was and `SaveError` is raised. A kind that is there
+    already is refused unless `replace` is true. What stands behind the last whole entry of a stream is left out.
+    """
+    sources: list[str | RecordedStream] = []
+    for stream in streams:
+        if isinstance(stream, Recording):
+            sources.extend(stream.streams)
+        else:
+            sources.append(stream if isinstance(stream, RecordedStream) else os.fspath(stream))
+    return _core.attach(os.fspath(movie), sources, replace)
+
+
+def stamp(movie: Path, creator: str, version: str) -> Creator:
+    """Appends who made the movie, and gives what was stored: the platform's name in place of `creator`."""
+    return _core.stamp(os.fspath(movie), creator, version)
+
+
+def repair(movie: Path, *, dry_run: bool = False) -> Repair:
+    """Mends a movie's last atom, or an append that was interrupted. With `dry_run` only says what it would do."""
+    return _core.repair(os.fspath(movie), dry_run)

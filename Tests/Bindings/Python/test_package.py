@@ -1,0 +1,64 @@
+import os
+import pathlib
+import re
+import subprocess
+import sys
+
+import numpy as np
+import zulmetadata
+from matplotlib import image
+
+PROJECT = pathlib.Path(__file__).parents[3]
+
+
+def test_version_is_the_projects():
+    text = (PROJECT / "CMakeLists.txt").read_text()
+    assert zulmetadata.__version__ == re.search(r"project\(ZULMetaData VERSION ([0-9.]+)", text).group(1)
+
+
+def test_everything_public_is_described():
+    for name in zulmetadata.__all__:
+        thing = getattr(zulmetadata, name)
+        assert isinstance(thing, str) or thing.__doc__, name
+
+
+def run(module, *arguments, **environment):
+    ended = subprocess.run([sys.executable, "-m", module, *arguments], capture_output=True, text=True,
+                           env=os.environ | environment)
+    assert ended.returncode == 0, ended.stdout + ended.stderr
+
+
+def test_stubs_say_what_the_core_has(tmp_path):
+    allowed = tmp_path / "allowed"  # the metaclass of pybind11, and constructors of what only the core makes
+    allowed.write_text(r"zulmetadata\._core\.[A-Z]\w+" + "\n" + r"zulmetadata\._core\.[A-Z]\w+\.__init__" + "\n")
+    run("mypy.stubtest", "--allowlist", str(allowed), "zulmetadata._core", MYPY_CACHE_DIR=str(tmp_path))
+
+
+def test_the_package_is_typed(tmp_path):
+    package = pathlib.Path(zulmetadata.__file__).parent
+    run("mypy", "--strict", str(package), MYPY_CACHE_DIR=str(tmp_path))
+
+
+def test_heat_map_is_hot_where_the_cursor_was(tmp_path, plain_movie):
+    # Ten seconds a quarter of the way into the region, and one second at three quarters.
+    cursor = [(t / 10, 480, 270) for t in range(100)] + [(10 + t / 100, 1120, 630) for t in range(100)]
+    streams = {"cursorLocation": cursor, "cursorAction": [(10.5, 1), (10.6, 2)],
+               "recordingRegion": [(0, 160, 90, 1280, 720)]}
+    for kind, entries in streams.items():
+        zulmetadata.write_stream(tmp_path / f"{kind}.dat", kind, entries)
+    zulmetadata.attach(plain_movie, [tmp_path / f"{kind}.dat" for kind in streams])
+
+    picture = tmp_path / "heat.png"
+    drawn = subprocess.run([sys.executable, PROJECT / "Examples" / "heat_map.py", plain_movie, picture],
+                           capture_output=True, text=True, check=True)
+    assert drawn.stdout == "11.0 s over the region, 1 clicks\n"
+    pixels = image.imread(picture)[:, :, :3]
+    assert pixels.shape == (540, 960, 3)
+    dark = pixels[:, :860].sum(axis=2) < 0.3  # the scale stands to the right
+    rows = np.flatnonzero(dark.mean(axis=1) > 0.5)
+    columns = np.flatnonzero(dark.mean(axis=0) > 0.5)
+    region = pixels[rows[0]:rows[-1], columns[0]:columns[-1]]
+    hot = np.argwhere((region[:, :, 0] > 0.6) & (region[:, :, 2] < 0.6))
+    assert len(hot) > 100
+    np.testing.assert_allclose(hot.mean(axis=0) / region.shape[:2], (0.25, 0.25), atol=0.03)
+    assert (region[region.shape[0] // 2] < 0.1).all() and (region > 0.9).all(axis=2).any()  # nothing between; a click
