@@ -9,6 +9,7 @@
 
 namespace ZULMetaData {
 
+/// What a recording tells of its machine.
 struct ZULMETADATA_API ProcessInfo {
     /// Processors that the machine has; never 0.
     std::uint64_t processorCount = 1;

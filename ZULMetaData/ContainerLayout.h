@@ -14,6 +14,7 @@
 
 namespace ZULMetaData {
 
+/// An atom of a movie or a chunk of a RIFF file, by what its header says.
 struct ZULMETADATA_API ContainerItem {
     std::string type;         ///< four characters as they are stored, whatever bytes they are
     std::uint64_t offset;     ///< where the header begins

@@ -27,6 +27,7 @@ struct FieldInfo {
     std::uint32_t size;
 };
 
+/// One field of an entry.
 struct SchemaFieldStep {
     using Condition = bool (*)(const Record&);
     using FieldGetter = FieldInfo (*)(Record&);

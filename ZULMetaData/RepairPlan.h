@@ -23,6 +23,7 @@ struct RepairChange {
     std::string reason; ///< one sentence
 };
 
+/// What is wrong with a movie, and what mends it.
 struct RepairPlan {
     enum State : std::int32_t { Whole, Repairable, Unrepairable };
 

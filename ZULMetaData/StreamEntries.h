@@ -67,6 +67,7 @@ private:
     std::size_t windowSize_ = 0;
 };
 
+/// A decoded entry.
 template <StreamValue T>
 struct TimedValue {
     double time = 0;

@@ -15,6 +15,7 @@
 
 namespace ZULMetaData {
 
+/// What a walk along a stream found.
 struct StreamExtent {
     /// What stands behind the last whole entry.
     enum End : std::int32_t {

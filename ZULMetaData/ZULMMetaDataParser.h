@@ -103,6 +103,7 @@ struct ZULMETADATA_API MP4MetaData {
     static void appendMetaData(const std::string& path, const std::map<uuid, std::string>& streams);
 };
 
+/// What is done to a finished movie.
 struct ZULMETADATA_API Util {
     /// Gives the last atom of a movie that was cut short its real size. True where the atoms (now) fill the file.
     /// An open-ended atom of 4 GiB and more needs the 8 spare bytes of a `wide` atom in front of it; it then gets

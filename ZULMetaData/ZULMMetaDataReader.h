@@ -24,6 +24,7 @@
 
 namespace ZULMetaData {
 
+/// What gets the entries of a stream. Never deleted by its readers.
 template <class T>
 class ZULMETADATA_API DataStreamObserver {
 public:
@@ -34,6 +35,7 @@ protected:
     ~DataStreamObserver() = default;
 };
 
+/// Reads streams of one type of value; holds nothing.
 template <StreamValue T>
 struct MetaDataReader {
     /// Reads the stream whose header stands at `start`; `length` counts the header. Entries are read while they

@@ -98,6 +98,7 @@ inline constexpr std::array<MetaDataKind, 23> s_metaDataKinds{{
 /// The registered kind of a stream, or null. Silent, unlike `currentVersionForUUID`.
 ZULMETADATA_API const MetaDataKind* findMetaDataKind(const uuid& type);
 
+/// Versions by kind.
 struct ZULMETADATA_API MetaDataUUID {
     /// The version that is written today; -1 for an unknown kind, with one line on standard output.
     static int currentVersionForUUID(const uuid& type);

@@ -33,6 +33,7 @@ concept PlatformTime = requires(const R& r) {
     { r.epoch } -> std::convertible_to<std::int64_t>;
 };
 
+/// A time as the platform's media services count it.
 struct MediaTime {
     std::int64_t value = 0;
     std::int32_t timescale = 0; ///< units of `value` in a second
@@ -50,6 +51,7 @@ struct MediaTime {
     double seconds() const { return static_cast<double>(value) / static_cast<double>(timescale); }
 };
 
+/// A position or a delta, in pixels; fractions are cut off where it is stored.
 struct ScreenPoint {
     double x = 0;
     double y = 0;
@@ -60,6 +62,7 @@ struct ScreenPoint {
     constexpr ScreenPoint(const P& point) : ScreenPoint(point.x, point.y) {}
 };
 
+/// Origin and size, in pixels; fractions are cut off where it is stored.
 struct ScreenRect {
     double x = 0;
     double y = 0;

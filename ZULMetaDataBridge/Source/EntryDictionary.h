@@ -97,6 +97,7 @@ public:
     using difference_type = std::ptrdiff_t;
     using reference = value_type;
 
+    /// Keeps the pair that `->` gives access to.
     struct pointer {
         value_type pair;
         const value_type* operator->() const { return &pair; }

@@ -8,6 +8,7 @@
 
 namespace ZULMetaData {
 
+/// The words for actions and keys that recorders number.
 struct ZULMETADATA_API HumanReadableActions {
     /// Whether every bit of `flag` is set. Throws `std::invalid_argument` "Flag should not be empty." for 0.
     static bool HasFlag(int value, int flag);

@@ -35,6 +35,7 @@ inline constexpr std::tuple s_pointFields{Field{"x", &Point::x}, Field{"y", &Poi
 inline constexpr std::tuple s_rectFields{Field{"x", &Rect::x}, Field{"y", &Rect::y}, Field{"width", &Rect::width},
                                          Field{"height", &Rect::height}};
 
+/// Where the window on top was.
 struct TopmostWindowKind {
     using Value = Rect;
     static constexpr uuid type = s_topmostWindowUUID;
@@ -42,6 +43,7 @@ struct TopmostWindowKind {
     static constexpr auto fields = s_rectFields;
 };
 
+/// What the cursor hovered over.
 struct HoverRectKind {
     using Value = Rect;
     static constexpr uuid type = s_hoverRectUUID;
@@ -49,6 +51,7 @@ struct HoverRectKind {
     static constexpr auto fields = s_rectFields;
 };
 
+/// The recorded region.
 struct RecordingRegionKind {
     using Value = Rect;
     static constexpr uuid type = s_recordingRegionUUID;
@@ -56,6 +59,7 @@ struct RecordingRegionKind {
     static constexpr auto fields = s_rectFields;
 };
 
+/// Scroll deltas.
 struct ScrollActionKind {
     using Value = Point;
     static constexpr uuid type = s_scrollActionUUID;
@@ -63,6 +67,7 @@ struct ScrollActionKind {
     static constexpr auto fields = s_pointFields;
 };
 
+/// Where the cursor was.
 struct CursorLocationKind {
     using Value = Point;
     static constexpr uuid type = s_cursorLocationUUID;
@@ -70,6 +75,7 @@ struct CursorLocationKind {
     static constexpr auto fields = s_pointFields;
 };
 
+/// How busy the machine was.
 struct CPUUsageKind {
     using Value = float;
     static constexpr uuid type = s_cpuUsageUUID;
@@ -77,6 +83,7 @@ struct CPUUsageKind {
     static constexpr std::tuple fields{Field{"cpuUsage", std::identity{}}};
 };
 
+/// How opaque the cursor was drawn.
 struct CursorOpacityKind {
     using Value = double;
     static constexpr uuid type = s_cursorOpacityUUID;
@@ -84,6 +91,7 @@ struct CursorOpacityKind {
     static constexpr std::tuple fields{Field{"opacity", std::identity{}}};
 };
 
+/// The display's scale factor.
 struct ScaleFactorKind {
     using Value = std::int32_t;
     static constexpr uuid type = s_recordingScaleFactorUUID;
@@ -91,6 +99,7 @@ struct ScaleFactorKind {
     static constexpr std::tuple fields{Field{"scaleFactor", std::identity{}}};
 };
 
+/// Titles of slides.
 struct SlideInfoTitleKind {
     using Value = std::string;
     static constexpr uuid type = s_slideTitlesUUID;
@@ -98,6 +107,7 @@ struct SlideInfoTitleKind {
     static constexpr std::tuple fields{Field{"title", textFromUTF8}};
 };
 
+/// Texts of slides.
 struct SlideInfoTextKind {
     using Value = std::string;
     static constexpr uuid type = s_slideTextUUID;
@@ -105,6 +115,7 @@ struct SlideInfoTextKind {
     static constexpr std::tuple fields{Field{"text", textFromUTF8}};
 };
 
+/// Comments to slides.
 struct SlideInfoCommentKind {
     using Value = std::string;
     static constexpr uuid type = s_slideCommentUUID;
@@ -112,6 +123,7 @@ struct SlideInfoCommentKind {
     static constexpr std::tuple fields{Field{"comment", textFromUTF8}};
 };
 
+/// The title of the window on top.
 struct TopmostWindowTitleKind {
     using Value = std::string;
     static constexpr uuid type = s_topmostWindowTitleUUID;
@@ -119,6 +131,7 @@ struct TopmostWindowTitleKind {
     static constexpr std::tuple fields{Field{"title", textFromUTF8}};
 };
 
+/// The application in front.
 struct TopmostAppNameKind {
     using Value = std::string;
     static constexpr uuid type = s_topmostAppNameUUID;
@@ -129,6 +142,7 @@ struct TopmostAppNameKind {
 /// The image that an entry carries, or the text "nil" where it has none or one that cannot be decoded.
 ZULMETADATA_API EntryValue entryImage(const CursorImage& cursor);
 
+/// What the cursor looked like.
 struct CursorImageKind {
     using Value = CursorImage;
     static constexpr uuid type = s_cursorImageUUID;
@@ -138,6 +152,7 @@ struct CursorImageKind {
                                        Field{"hotspotOffsetY", &CursorImage::hotspotOffsetY}};
 };
 
+/// Buttons and modifiers.
 struct CursorActionKind {
     using Value = std::int32_t;
     static constexpr uuid type = s_cursorActionUUID;
@@ -154,6 +169,7 @@ inline std::string keyModifiersText(const KeyStroke& key) {
     return HumanReadableActions::KeyboardModifiersToString(static_cast<std::int32_t>(key.eventFlagsCode));
 }
 
+/// Keys and modifiers.
 struct KeyboardActionKind {
     using Value = KeyStroke;
     static constexpr uuid type = s_keyboardActionUUID;
@@ -171,6 +187,7 @@ std::string systemText(const std::list<std::string>& texts) {
     return textFromLatin1(*std::next(texts.begin(), Position));
 }
 
+/// The machine.
 struct SystemDataKind {
     using Value = std::list<std::string>;
     static constexpr uuid type = s_systemDataUUID;
@@ -180,6 +197,7 @@ struct SystemDataKind {
                                        Field{"ram", systemText<3>}};
 };
 
+/// Kinds as a type, so that code can be made for each of them.
 template <class... Kinds>
 struct KindList {
     static constexpr std::size_t size = sizeof...(Kinds);

@@ -126,10 +126,11 @@ constexpr const FindingRule& ruleOf(FindingCode code) {
     return s_findingRules[static_cast<std::size_t>(code)];
 }
 
+/// Something worth telling about a file, and where it stands.
 struct Finding {
     FindingCode code;
     std::string place;    ///< the stream's kind (its identifier where that has no name), or the type of the atom, in
-                          ///< which bytes that cannot be printed are \xNN
+                          ///< which bytes that cannot be printed are `\xNN`
     std::uint64_t offset; ///< in the file: of the atom, the entry, the header's field, the image or the bad character
     std::string sentence;
 
@@ -156,6 +157,7 @@ struct ZULMETADATA_API StreamReport {
     std::string name() const;
 };
 
+/// What a file holds, and what is wrong with it.
 struct ZULMETADATA_API ValidationReport {
     /// More of either severity are only counted, so that the report stays small whatever the file.
     static constexpr std::size_t s_maximumFindings = 1000;

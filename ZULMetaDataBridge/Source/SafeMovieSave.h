@@ -44,6 +44,7 @@ private:
     Reason reason_;
 };
 
+/// What became of one stream.
 struct AttachedStream {
     std::string name; ///< of its source
     uuid type{};
@@ -54,11 +55,13 @@ struct AttachedStream {
     StreamExtent::End cutBecause = StreamExtent::AtEntry;
 };
 
+/// What was done to the movie.
 struct AttachResult {
     RepairPlan repair; ///< what was done before
     std::vector<AttachedStream> streams;
 };
 
+/// What was done to the movie.
 struct StampResult {
     RepairPlan repair; ///< what was done before
     ZCAPHeader info;   ///< as it can be read back

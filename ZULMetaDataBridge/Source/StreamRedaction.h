@@ -23,11 +23,13 @@ namespace ZULMetaData {
 /// What takes the place of a hidden text: an ellipsis, whatever its length was.
 inline constexpr const char* s_hiddenText = "\xe2\x80\xa6";
 
+/// A part of the recording.
 struct TimeRange {
     double from = 0; ///< seconds; both ends belong to it
     double to = 0;
 };
 
+/// What a copy must lack.
 struct Redaction {
     std::set<uuid> removedKinds;
 
@@ -42,6 +44,7 @@ struct Redaction {
     std::optional<TimeRange> removedTimes;
 };
 
+/// What a copy lacks.
 struct RedactedStream {
     /// Why it is not in the copy.
     enum Removal : std::int32_t {

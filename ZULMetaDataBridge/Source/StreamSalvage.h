@@ -22,6 +22,7 @@
 
 namespace ZULMetaData {
 
+/// A stream that was found, and how much of it is whole.
 struct SalvagedStream {
     /// How it was found, from the best to the worst.
     enum Origin : std::int32_t {
@@ -43,6 +44,7 @@ struct SalvagedStream {
     std::uint64_t end() const { return offset + bytes; }
 };
 
+/// What was found.
 struct SalvageReport {
     /// More are not looked for: a file full of headers must not fill the memory.
     static constexpr std::size_t s_maximumStreams = 10000;

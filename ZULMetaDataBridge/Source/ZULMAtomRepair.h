@@ -5,6 +5,7 @@
 
 namespace ZULMetaData {
 
+/// Mends a movie as recorders always have; `SafeMovieSave::repair` is the safe way.
 class ZULMETADATA_API ZULMAtomRepair {
 public:
     /// Gives the last atom of a movie that was cut short its real size; see `Util::finalizeAtomsInFile`.

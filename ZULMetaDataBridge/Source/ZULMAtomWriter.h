@@ -7,6 +7,7 @@
 
 namespace ZULMetaData {
 
+/// Attaches streams as recorders always have; `SafeMovieSave::attach` is the safe way.
 class ZULMETADATA_API ZULMAtomWriter {
 public:
     /// Repairs the movie's last atom and appends the stream files behind it as one atom, in this order. Failures

@@ -8,6 +8,7 @@
 
 namespace ZULMetaData {
 
+/// Stamps a movie as recorders always have; `SafeMovieSave::stamp` is the safe way.
 class ZULMETADATA_API ZULRAtomWriter {
 public:
     /// Repairs the movie's last atom and appends a `ZULR` atom of 80 bytes: the header, then a `ZCAPHeader` of

@@ -16,6 +16,7 @@
 
 namespace ZULMetaData {
 
+/// Reads the entries of one kind.
 template <class Kind>
 class ZULMETADATA_API KindMetaDataParser : public BaseMetaDataParser {
 public:

@@ -20,6 +20,7 @@ namespace ZULMetaData {
 /// What becomes of the stream writer when the writer that made it is destroyed.
 enum class StreamWriterRelease { WithWriter, Never };
 
+/// Owns the stream writer of one kind.
 template <class Kind, StreamWriterRelease Release = StreamWriterRelease::WithWriter>
 class ZULMETADATA_API KindMetaDataWriter : public BaseMetaDataWriter {
 public:
