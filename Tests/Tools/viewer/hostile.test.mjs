@@ -35,6 +35,30 @@ test('a file that is no recording is refused in words, and the next one opens', 
   await close();
 });
 
+test('files of other people are refused in words that name what is wrong', async () => {
+  const whole = readFileSync(recording.movie);
+  const files = {
+    'Empty.mp4': ['', /^Empty\.mp4 cannot be shown: it is empty\.$/],
+    Empty: ['', /^Empty cannot be shown: it is empty\.$/],
+    'Letter.txt': ['Dear reader\n'.repeat(9), /: it begins neither like a movie, nor a RIFF file, nor a stream\.$/],
+    '<img src=x onerror=fail()>.mp4': ['\0'.repeat(99), /^<img src=x onerror=fail\(\)>\.mp4 cannot be shown: \S/],
+    'Half.mp4': [
+      whole.subarray(0, whole.length / 2),
+      /: it holds nothing that was recorded beside a movie, and is damaged: mdat at offset \d+, it says that it has /,
+    ],
+  };
+  const { page, problems, close } = await open(empty);
+  for (const [name, [bytes, words]] of Object.entries(files)) {
+    writeFileSync(join(folder, name), bytes);
+    await give(page, join(folder, name));
+    assert.match(await textOf(page, '#notice-text'), words);
+  }
+  await give(page, recording.movie);
+  await opened(page);
+  assert.deepEqual(problems, []);
+  await close();
+});
+
 test('a movie that was cut is shown with what is wrong with it', async () => {
   const cut = join(folder, 'Cut.mp4');
   const bytes = readFileSync(recording.movie);

@@ -1,7 +1,8 @@
 // The page of the demo's movie: what it draws is what was recorded.
 
 import assert from 'node:assert/strict';
-import { readFileSync, writeFileSync } from 'node:fs';
+import { execFileSync } from 'node:child_process';
+import { mkdirSync, readFileSync, writeFileSync } from 'node:fs';
 import { join } from 'node:path';
 import { test } from 'node:test';
 import { folder, emptyPage, open, opened, ready, recordedSession, seek, state, textOf, zulm } from './support.mjs';
@@ -307,6 +308,96 @@ test('entries are filtered, lead to their time and are copied masked', async () 
   for (const line of copied) assert.match(line, /^•,•,/);
   await page.locator('.table-row', { hasText: '0:05.500' }).click();
   assert.equal((await state(page)).time, 5.5);
+  await close();
+});
+
+test('a stream that a later one of its kind hides can be looked at', async () => {
+  const later = readFileSync(join(folder, 'streams/cursorLocation.dat')).subarray(0, 24 + 16 * 100);
+  mkdirSync(join(folder, 'later'), { recursive: true });
+  writeFileSync(join(folder, 'later/cursorLocation.dat'), later);
+  zulm('attach', 'Recording.mp4', 'later/cursorLocation.dat', '--replace', '-o', 'Two.mp4', '--force');
+  writeFileSync(join(folder, 'empty.html'), emptyPage(readFileSync(recording.page, 'utf8')));
+  const { page, problems, close } = await open(join(folder, 'empty.html'));
+  await page.setInputFiles('#file-input', join(folder, 'Two.mp4'));
+  await opened(page);
+  await seek(page, 10); // behind the end of the stream that readers find
+  const [{ x, y }, region] = [streams.get('cursorLocation')[99], streams.get('recordingRegion')[0]];
+  assert.deepEqual((await state(page)).hotSpot, { x: x - region.x, y: y - region.y });
+  const choice = page.getByLabel('Stream', { exact: true });
+  await choice.selectOption({ label: 'Cursor location (100)' });
+  assert.equal(await textOf(page, '.entries-status'), '100 entries');
+  await choice.selectOption({ label: 'Cursor location, hidden (1,200)' });
+  assert.equal(await textOf(page, '.entries-status'), '1,200 entries');
+  assert.match(await textOf(page, '.entries-note'), /^No reader finds this stream\. A later stream of its kind/);
+  assert.equal(await page.locator('.lane-label.is-hidden').innerText(), 'Cursor location\nhidden');
+  await page.getByRole('tab', { name: 'Facts' }).click();
+  assert.match(await textOf(page, '.facts tr.is-hidden'), /^Cursor location hidden\s+1,200\s/);
+  await page.getByRole('tab', { name: /^Check/ }).click();
+  assert.match(await textOf(page, '.finding.is-damage'), /^cursorLocation at offset [\d,]+\n+readers find this stream/);
+  assert.deepEqual(problems, []);
+  await close();
+});
+
+/// A stream of cursor images, one a second.
+function cursorStream(pictures) {
+  const header = readFileSync(join(folder, 'streams/cursorImage.dat')).subarray(0, 24);
+  const entries = pictures.map((picture, i) => {
+    const entry = Buffer.alloc(44 + picture.length);
+    entry.writeUInt32LE(40 + picture.length, 0);
+    entry.writeDoubleLE(i, 4);
+    entry.writeBigInt64LE(BigInt(i + 1), 12);
+    [20 + picture.length, picture.length, 5, 3].forEach((value, k) => entry.writeUInt32LE(value, 20 + 4 * k));
+    picture.copy(entry, 36);
+    return entry;
+  });
+  return Buffer.concat([header, ...entries]);
+}
+
+test('cursor images in TIFF are drawn like those in PNG', async () => {
+  const source = ['-f', 'lavfi', '-i', 'testsrc2=s=40x32,format=rgba,colorchannelmixer=aa=0.7', '-frames:v', '1'];
+  const picture = (name, ...options) => {
+    execFileSync('ffmpeg', ['-v', 'error', '-y', ...source, '-pix_fmt', 'rgba', ...options, join(folder, name)]);
+    return readFileSync(join(folder, name));
+  };
+  const compressions = ['raw', 'lzw', 'deflate', 'packbits'];
+  const pictures = [
+    picture('cursor.png'),
+    ...compressions.map((name) => picture(`${name}.tiff`, '-compression_algo', name)),
+  ];
+  const streams = join(folder, 'tiff');
+  mkdirSync(streams, { recursive: true });
+  writeFileSync(join(streams, 'cursorImage.dat'), cursorStream(pictures));
+  const location = readFileSync(join(folder, 'streams/cursorLocation.dat')).subarray(0, 24 + 16);
+  writeFileSync(join(streams, 'cursorLocation.dat'), location);
+  zulm('attach', 'plain.mp4', 'tiff/cursorImage.dat', 'tiff/cursorLocation.dat', '-o', 'Tiff.mp4', '--force');
+  zulm('view', 'Tiff.mp4', '-o', 'Tiff.html');
+  const { page, problems, close } = await open(join(folder, 'Tiff.html'));
+  await opened(page);
+  await ready(page);
+  await page.waitForTimeout(500); // until all are decoded
+  const drawn = [];
+  for (const i of pictures.keys()) {
+    await seek(page, i + 0.5);
+    drawn.push(await page.evaluate(() => document.getElementById('overlay').toDataURL()));
+  }
+  for (const [i, name] of compressions.entries()) assert.ok(drawn[i + 1] === drawn[0], name);
+  const layer = await page.evaluate(() => document.getElementById('overlay').toDataURL());
+  await page.keyboard.press('1');
+  await page.waitForFunction((layer) => document.getElementById('overlay').toDataURL() !== layer, layer);
+  assert.deepEqual(problems, []);
+  await close();
+});
+
+test('the page holds the licence of everything in it', async () => {
+  const { page, close } = await open(recording.page);
+  await page.locator('#about-button').click();
+  const names = await page.locator('#about-dialog summary').allInnerTexts();
+  for (const name of ['JSON for Modern C++', '{fmt}', 'Emscripten', 'musl', 'LLVM', 'tiff', 'fflate', 'iobuffer'])
+    assert.ok(
+      names.some((text) => text.startsWith(name)),
+      `${name} in ${names.join()}`,
+    );
+  for (const text of await page.locator('#about-dialog pre').allTextContents()) assert.ok(text.length > 40, text);
   await close();
 });
 

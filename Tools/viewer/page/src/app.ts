@@ -113,15 +113,16 @@ export class App {
     const opening = ++this.opened;
     document.body.classList.add('is-busy');
     try {
+      if (source instanceof Blob && source.size === 0) throw new Error('it is empty');
       const { decoded, problems } = await this.decoder.open(source, name);
       if (opening !== this.opened) return;
       mark('zulm:decoded');
-      if (decoded.streams.length === 0) throw new Error('it holds nothing that was recorded beside a movie');
+      if (decoded.streams.length === 0 && decoded.hidden.length === 0) throw new Error(whyNothing(decoded));
       byId('notice').hidden = true;
       this.show(new Session(complete(decoded)));
       if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
     } catch (error) {
-      if (opening === this.opened) this.complain(`${name} cannot be shown: ${wordsOf(error)}.`);
+      if (opening === this.opened) this.complain(`${name} cannot be shown: ${wordsOf(error, name)}.`);
     } finally {
       if (opening === this.opened) document.body.classList.remove('is-busy');
       ++this.finished;
@@ -313,8 +314,21 @@ export class App {
   }
 }
 
-function wordsOf(error: unknown): string {
-  return (error instanceof Error ? error.message : String(error)).replace(/\.$/, '');
+/// Without the name of the file in front, where the sentence has it already.
+function wordsOf(error: unknown, name = ''): string {
+  const words = (error instanceof Error ? error.message : String(error)).replace(/\.$/, '');
+  return name && words.startsWith(`${name}: `) ? words.slice(name.length + 2) : words;
+}
+
+const firstAtoms = /^(ftyp|mdat|moov|free|skip|wide|RIFF)$/;
+
+/// Of a file in which no reader finds a stream. One that was cut short has lost them, and says so.
+function whyNothing({ verify }: Decoded): string {
+  const finding = verify.findings?.find(({ severity }) => severity === 'damage');
+  if (finding?.offset === 0 && !firstAtoms.test(finding.place ?? ''))
+    return 'it begins neither like a movie, nor a RIFF file, nor a stream';
+  const nothing = 'it holds nothing that was recorded beside a movie';
+  return finding ? `${nothing}, and is damaged: ${finding.place} at offset ${finding.offset}, ${finding.message}` : nothing;
 }
 
 function debounced(action: () => void, delay: number): () => void {

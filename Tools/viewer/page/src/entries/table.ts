@@ -9,6 +9,27 @@ import type { Rows } from './rows';
 const rowLines = 24; // pixels of a row where text has its usual size
 const tallest = 16_000_000; // pixels: browsers do not lay out much more
 
+/// What was cut is told where the pointer rests.
+function showWhole(cell: HTMLElement): void {
+  if (cell.scrollWidth > cell.clientWidth) cell.title = cell.textContent ?? '';
+  else cell.removeAttribute('title');
+}
+
+const sampled = 200; // rows, all along the stream
+const letter = 0.45; // times the size of the text, with room for the widest digits
+
+/// What a column needs, in multiples of the usual size: a number is never cut, a text may be.
+function leastWidth(rows: Rows, column: number): number {
+  const { name, title, isNumber } = rows.columns[column]!;
+  if (column === 0) return 4.75;
+  if (name === 'kind') return 8;
+  if (!isNumber) return 7;
+  let longest = title.length;
+  const step = Math.max(1, Math.floor(rows.count / sampled));
+  for (let row = 0; row < rows.count; row += step) longest = Math.max(longest, rows.cell(row, column).length);
+  return Math.max(3.5, Math.min(longest, 22) * letter);
+}
+
 export class Table {
   onActivate: (row: number) => void = () => {};
   private rows: Rows | undefined;
@@ -29,19 +50,18 @@ export class Table {
     this.scroller.addEventListener('scroll', () => measured('zulm:table', () => this.draw()));
     this.scroller.addEventListener('keydown', (event) => this.press(event));
     this.space.addEventListener('click', (event) => this.click(event));
+    this.space.addEventListener('pointerover', ({ target }) => showWhole(target as HTMLElement));
     new ResizeObserver(() => this.resize()).observe(this.scroller);
   }
 
   show(rows: Rows): void {
     [this.rows, this.chosen, this.current, this.selected, this.anchor] = [rows, null, -1, -1, -1];
+    const least = rows.columns.map((_, column) => leastWidth(rows, column));
     const widths = rows.columns.map(({ name, isNumber }, i) =>
-      i === 0 ? '4.75rem' : name === 'kind' ? '8rem' : isNumber ? 'minmax(3.5rem, 1fr)' : 'minmax(7rem, 2fr)',
+      i === 0 || name === 'kind' ? `${least[i]}rem` : `minmax(${least[i]}rem, ${isNumber ? 1 : 2}fr)`,
     );
     this.scroller.style.setProperty('--columns', widths.join(' '));
-    this.scroller.style.setProperty(
-      '--least',
-      `${rows.columns.reduce((sum, { isNumber }, i) => sum + (i === 0 ? 5.5 : isNumber ? 4.25 : 7.75), 1.5)}rem`,
-    );
+    this.scroller.style.setProperty('--least', `${least.reduce((sum, width) => sum + width + 0.625, 1)}rem`);
     this.head.replaceChildren(
       ...rows.columns.map(({ title, isNumber }) =>
         make('div', { role: 'columnheader', class: isNumber ? 'is-number' : undefined, title }, title),

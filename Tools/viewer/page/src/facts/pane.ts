@@ -39,8 +39,6 @@ function recordingFacts({ name, container, info }: Session, duration: number): F
     ['Length', clock(duration)],
   ];
   if (typeof info.bytes === 'number') facts.push(['Size', bytes(info.bytes)]);
-  for (const warning of info.warnings ?? [])
-    facts.push(['Warning', typeof warning === 'string' ? warning : JSON.stringify(warning)]);
   return facts;
 }
 
@@ -152,16 +150,16 @@ export function showCheck(session: Session): void {
   setIcon(verdict, isDamaged ? 'bad' : 'good');
   const items = findings.map((finding) => {
     const place = [
-      finding.kind ?? finding.stream,
-      typeof finding.offset === 'number' && `offset ${count(finding.offset)}`,
+      finding.place ?? finding.kind,
+      typeof finding.offset === 'number' && `at offset ${count(finding.offset)}`,
     ]
       .filter(Boolean)
-      .join(', ');
+      .join(' ');
     return make(
       'li',
       { class: `finding is-${finding.severity ?? 'notice'}` },
-      make('p', {}, sentence(finding)),
       make('p', { class: 'quiet' }, place),
+      make('p', {}, sentence(finding)),
     );
   });
   byId('pane-verify').replaceChildren(

@@ -19,6 +19,7 @@ export interface TimelineEvents extends LaneOptions {
 
 const rulerHeight = 26;
 const laneGap = 1;
+const headHeight = 62; // of the overview and the ruler
 
 export class Timeline {
   range: Range = { from: 0, to: 1 };
@@ -104,7 +105,7 @@ export class Timeline {
       ...this.lanes.map(({ title, height, isHidden }, i) => {
         const label = make(
           'div',
-          { class: 'lane-label' },
+          { class: isHidden ? 'lane-label is-hidden' : 'lane-label' },
           make('span', { class: 'lane-title', title }, title),
           isHidden ? make('span', { class: 'tag' }, 'hidden') : this.values[i]!,
         );
@@ -112,9 +113,14 @@ export class Timeline {
         return label;
       }),
     );
+    document.documentElement.style.setProperty('--lanes-content', `${(headHeight + this.lanesHeight) / 16}rem`);
     this.overview.show(session, duration);
     this.ruler.setAttribute('aria-valuemax', duration.toFixed(3));
     this.setRange({ from: 0, to: duration });
+  }
+
+  private get lanesHeight(): number {
+    return this.lanes.reduce((sum, lane) => sum + lane.height + laneGap, 0);
   }
 
   /// A movie may be longer than what was recorded beside it.
@@ -198,7 +204,7 @@ export class Timeline {
     this.isStale = false;
     const scale = uiScale();
     const width = this.width / scale;
-    const height = this.lanes.reduce((sum, lane) => sum + lane.height + laneGap, 0);
+    const height = this.lanesHeight;
     this.lanesCanvas.style.height = `${height * scale}px`;
     const ratio = fitCanvas(this.lanesCanvas, this.width, height * scale) * scale;
     const context = this.lanesCanvas.getContext('2d');

@@ -13,6 +13,8 @@ import { Track } from './track';
 export interface Finding {
   severity?: string;
   message?: string;
+  /// The stream's kind, or the type of the atom.
+  place?: string;
   [key: string]: unknown;
 }
 
@@ -25,7 +27,6 @@ export interface FileInfo {
   streams?: { kind: string; uuid: string; version: number; entries: number; bytes: number; offset: number }[];
   creators?: { name?: string; version?: string; platform_version?: string }[];
   foreign_atoms?: unknown[];
-  warnings?: unknown[];
 }
 
 export interface FileCheck {
