@@ -118,7 +118,7 @@ TEST(RepairPlan, CannotSizeAnOpenEndOfFourGiBWithoutTheSpareAtomDirectlyInFront)
 
 // Eight bytes short -----------------------------------------------------------------------------------------------
 
-/// What the described repair makes of a movie of 4 GiB and more, then `behind`.
+/// What `Util::finalizeAtomsInFile` makes of a movie of 4 GiB and more, then `behind`.
 RepairPlan planForShortMovie(const std::string& lastBytes, const std::string& behind = {}) {
     const std::string head = atom("ftyp", "mp42") + be32(1) + "mdat" + be64(s_4GiB);
     return planForLarge(12 + s_4GiB + 8 + behind.size(), head, lastBytes + behind);
@@ -176,6 +176,12 @@ TEST(RepairPlan, LeavesWhatIsNeitherShortNorAppended) {
                        "without a readable type");
     const std::string small = atom("ftyp", "mp42") + extendedAtom("mdat", "media") + hex("ffffffffffffffff");
     expectUnrepairable(planFor(small), 12 + 21, "without a readable type");
+}
+
+TEST(RepairPlan, TakesNoAtomForShortWhoseLengthFitsIn32Bits) {
+    const std::string head = be32(1) + "mdat" + be64(s_4GiB - 1);
+    expectUnrepairable(planForLarge(s_4GiB - 1 + 8, head, hex("ffffffffffffffff")), s_4GiB - 1,
+                       "without a readable type");
 }
 
 // An append that was interrupted ----------------------------------------------------------------------------------

@@ -15,8 +15,8 @@ namespace {
 /// Whether a whole number, told from all others by these digits, takes no more characters with all of its digits than
 /// with an exponent. All of them are then its own; "100000000" may stand for a number that is a little less.
 bool isWrittenOut(float value, std::string digits) {
-    if (std::trunc(value) != value)
-        return false;
+    if (value == 0 || std::trunc(value) != value)
+        return value == 0;
     digits.resize(std::min(digits.find('e'), digits.size()));
     std::erase_if(digits, [](char c) { return c < '0' || c > '9'; });
     const std::size_t telling = digits.find_last_not_of('0') + 1;
