@@ -25,9 +25,10 @@ public:
         std::uint64_t position = begin;
         visit(begin, end, [&](const ContainerItem& found) {
             LayoutItem item = entryFor(found, isInsideMetaData);
-            position = behind(item);
             const std::string reason = reasonToEnd(item, end, isInsideMetaData);
-            if (!reason.empty())
+            if (reason.empty())
+                position = behind(item);
+            else
                 layout_.ends.push_back({found.offset, reason});
             if (isInsideMetaData || item.isMetaData || part_ == LayoutPart::Whole)
                 items.push_back(std::move(item));
@@ -39,8 +40,7 @@ public:
                 {position, fmt::format("{} bytes are left, too few for another header", end - position)});
         for (LayoutItem& item : items) {
             if (item.isMetaData)
-                item.children =
-                    this->items(item.item.payloadOffset(), std::min(item.item.offset + item.size, end), true);
+                item.children = this->items(item.item.payloadOffset(), std::min(item.item.end(), end), true);
             else if (isInsideMetaData && !item.isForeign)
                 item.stream = streamAt(item.item.payloadOffset());
         }
@@ -75,6 +75,7 @@ private:
         return header.uuid;
     }
 
+    /// Where the next item is, behind one that has no reason to end.
     std::uint64_t behind(const LayoutItem& entry) const {
         return entry.item.offset + entry.size + (isMovie() ? 0 : entry.size % 2);
     }

@@ -169,6 +169,8 @@ def movies():
             "the end of the media data wraps around 64 bits to the start of the file", ("beyond-file", 12))
     invalid("movie-zulm-beyond-file.mp4", good[:-16], "the file was cut short between two entries",
             ("beyond-file", ZULM), ("beyond-file", FIRST))
+    invalid("movie-zulm-wraps-around.mp4", MEDIA + sized_atom(b"ZULM", 2**64 - 12, data(LOCATIONS)),
+            "the end of the ZULM wraps around 64 bits to the start of the file", ("beyond-file", ZULM))
     invalid("movie-cut-in-entry.mp4", good[:-5], "the file was cut short inside an entry", ("beyond-file", ZULM),
             ("beyond-file", FIRST), ("torn-entry", ENTRIES + 16))
     invalid("movie-cut-in-stream-header.mp4", good[:STREAM + 20], "the file was cut short inside a stream's header",
