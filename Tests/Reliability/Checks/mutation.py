@@ -44,6 +44,8 @@ COVERED_BY = {
     "CursorImageSteps.h": CURSORS,
     "CursorImageWriter.cpp": CURSORS,
     "CursorImageWriter.h": CURSORS,
+    "FileInputBuffer.cpp": ["FileInputBuffer", "MetaDataParser"],
+    "FileInputBuffer.h": ["FileInputBuffer", "MetaDataParser"],
     "InvalidEntry.h": READER,
     "MP4MetaData.cpp": ["MP4MetaData"],
     "MovieDuration.cpp": ["MovieDuration"],
@@ -167,6 +169,8 @@ def all_mutants(tree):
     for file in sorted((tree.root / "ZULMetaData").glob("*.*")):
         if file.suffix in (".h", ".cpp"):
             found += mutants.mutants(file.name, file.read_text())
+    if unknown := {mutant.file for mutant in found} - set(COVERED_BY):
+        raise RuntimeError(f"no tests are named for {', '.join(sorted(unknown))}")
     random.Random(SEED).shuffle(found)
     return found
 
@@ -179,10 +183,10 @@ def check_tests(tree):
     return [name for name in tree.tests if worker.is_killed(name, library, "") is not False]
 
 
-def judge_all(tree, wanted):
-    """Pairs of mutant and whether it was killed, of those that compile."""
+def judge_all(tree, wanted, candidates, journal):
+    """Pairs of mutant and whether it was killed, of those that compile. The journal shows them as they come."""
     workers = [Worker(tree) for _ in range(WORKERS)]
-    candidates = iter(all_mutants(tree))
+    candidates = iter(candidates)
     judged = []
 
     def work(worker):
@@ -192,6 +196,7 @@ def judge_all(tree, wanted):
             killed = worker.judge(mutant)
             if killed is not None and len(judged) < wanted:
                 judged.append((mutant, killed))
+                print("killed" if killed else "LIVES", mutant, file=journal, flush=True)
 
     with concurrent.futures.ThreadPoolExecutor(WORKERS) as pool:
         list(pool.map(work, workers))
@@ -201,11 +206,13 @@ def judge_all(tree, wanted):
 def run(context, wanted=WANTED):
     result = check.Result()
     tree = Tree(context.source, context.folder)
+    candidates = all_mutants(tree)
     tree.build()
     if failing := check_tests(tree):
         result.failures.append(f"without a change these tests fail: {', '.join(failing)}")
         return result
-    judged = judge_all(tree, wanted)
+    with open(context.build / "mutants.log", "w", encoding="utf-8") as journal:
+        judged = judge_all(tree, wanted, candidates, journal)
     living = [mutant for mutant, killed in judged if not killed]
     result.cases = len(judged)
     result.notes = [f"{len(judged) - len(living)} of {len(judged)} mutants were killed; the others:",
