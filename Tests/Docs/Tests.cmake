@@ -1,0 +1,36 @@
+# Every block of code in the pages is compiled and run, what is made from sources is compared with them, and the pages
+# about the house with its includes.
+if(CMAKE_CROSSCOMPILING)
+  return()
+endif()
+find_program(PYTHON3 python3 REQUIRED)
+mark_as_advanced(PYTHON3)
+set(docs_tests ${CMAKE_CURRENT_LIST_DIR})
+
+file(GLOB pages CONFIGURE_DEPENDS ${PROJECT_SOURCE_DIR}/Docs/*.md)
+list(APPEND pages ${PROJECT_SOURCE_DIR}/README.md ${PROJECT_SOURCE_DIR}/Bindings/Python/README.md)
+foreach(page IN LISTS pages)
+  file(STRINGS ${page} fences REGEX "^```(cpp|sh|python)$")
+  if(NOT fences)
+    continue()
+  endif()
+  cmake_path(RELATIVE_PATH page BASE_DIRECTORY ${PROJECT_SOURCE_DIR} OUTPUT_VARIABLE name)
+  string(REPLACE "/" "." target ${name})
+  string(REGEX REPLACE "\\.md$" "" target Docs.blocks.${target})
+  set(program "")
+  if("```cpp" IN_LIST fences)
+    set(source ${CMAKE_CURRENT_BINARY_DIR}/${target}.cpp)
+    add_custom_command(OUTPUT ${source} COMMAND ${PYTHON3} ${docs_tests}/blocks.py cpp ${page} ${source}
+      DEPENDS ${page} ${docs_tests}/blocks.py VERBATIM)
+    add_executable(${target} ${source})
+    target_link_libraries(${target} PRIVATE ZULMetaData::Bridge)
+    zulm_project_options(${target})
+    set(program $<TARGET_FILE:${target}>)
+  endif()
+  add_test(NAME Docs/blocks/${name} COMMAND ${PYTHON3} ${docs_tests}/blocks.py run ${page} "${program}" ${ZULM_PATH}
+    "${ZULMETADATA_PYTHON_PACKAGE}" $<BOOL:${ZULM_VIEWER}>)
+  set_tests_properties(Docs/blocks/${name} PROPERTIES TIMEOUT 600)
+endforeach()
+
+add_test(NAME Docs/made_parts COMMAND ${PYTHON3} ${docs_tests}/made_parts.py ${ZULM_PATH})
+add_test(NAME Docs/architecture COMMAND ${PYTHON3} ${PROJECT_SOURCE_DIR}/scripts/check_includes.py)

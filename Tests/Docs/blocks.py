@@ -1,0 +1,160 @@
+"""The blocks of code in a page, for the tests that compile and run them.
+
+A block is C++, shell or Python by the word behind its first fence. A block of the language `text` that follows at once is
+what it prints. C++ without a `main` is the body of a function of its own, behind includes of its own.
+
+    blocks.py cpp PAGE OUTPUT    writes one source, which runs the block whose number it is given
+    blocks.py run PAGE PROGRAM ZULM PYTHONPATH VIEWER    runs every block in a folder of recordings of its own; without
+        PYTHONPATH none of Python, and with VIEWER 0 no `zulm view`
+"""
+
+import os
+import pathlib
+import re
+import shutil
+import subprocess
+import sys
+import tempfile
+
+FENCE = re.compile(r"^```(\w*)\n(.*?)^```$", re.MULTILINE | re.DOTALL)
+ROOT = pathlib.Path(__file__).resolve().parents[2]
+TESTED = ("cpp", "sh", "python")
+OTHERS = ("text", "cmake", "js")  # of which cmake and js have tests of their own
+# 1: a file could not be read; 2: wrong usage. The others tell what was found.
+FINE = (0, 3, 4)
+
+
+class Block:
+    def __init__(self, language, code, line):
+        self.language = language
+        self.code = code
+        self.line = line
+        self.printed = None
+
+
+def blocks_of(page):
+    text = page.read_text(encoding="utf-8")
+    blocks = []
+    end_of_last = -1
+    for found in FENCE.finditer(text):
+        block = Block(found[1], found[2], text.count("\n", 0, found.start()) + 1)
+        if block.language == "text" and blocks and text[end_of_last:found.start()].strip() == "":
+            blocks[-1].printed = block.code
+        elif block.language in TESTED:
+            blocks.append(block)
+        elif block.language not in OTHERS and page.name != "tool.md":  # whose lines of usage are no commands
+            sys.exit(f"{page}:{block.line}: of which language is this block?")
+        end_of_last = found.end()
+    return blocks
+
+
+def cpp_source(page):
+    """A `main` becomes a function like any other block."""
+    includes = ['#include "ZULMetaDataBridge/ZULMetaDataBridge.h"', "#include <filesystem>", "#include <fstream>",
+                "#include <iostream>", "#include <memory>", "#include <string>", "#include <vector>"]
+    bodies, calls = [], []
+    for block in blocks_of(page):
+        if block.language != "cpp":
+            continue
+        includes += re.findall(r"^#include .*$", block.code, re.MULTILINE)
+        code = re.sub(r"^(#include .*|using namespace ZULMetaData;)\n", "", block.code, flags=re.MULTILINE)
+        name = f"blockAtLine{block.line}"
+        if "int main() {" in code:
+            code = code.replace("int main() {", f"void {name}() {{")
+        else:
+            code = f"void {name}() {{\n{code}}}\n"
+        bodies.append(f'#line {block.line} "{page.name}"\n{code}')
+        calls.append(f"    if (block == {block.line})\n        {name}();\n")
+    return "\n".join([*dict.fromkeys(includes), "using namespace ZULMetaData;", "namespace {", *bodies, "}",
+                      "int main(int, char** arguments) {", "    const int block = std::atoi(arguments[1]);", *calls, "}"])
+
+
+def make_recordings(folder, zulm):
+    """What the blocks speak of: the demo's recording and its stream files, a movie without metadata, a damaged one."""
+    subprocess.run([zulm, "demo", "demo"], check=True, cwd=folder, stdout=subprocess.DEVNULL)
+    recording = (folder / "demo" / "Recording.mp4").read_bytes()
+    metadata = recording.index(b"ZULM") - 4
+    for name in ("Recording", "Original", "Edited"):
+        (folder / f"{name}.mp4").write_bytes(recording)
+    for name in ("Movie", "Remuxed", "Copy"):
+        (folder / f"{name}.mp4").write_bytes(recording[:metadata])
+    (folder / "Broken.mp4").write_bytes(recording[:-100])
+    for stream in (folder / "demo" / "streams").iterdir():
+        shutil.copy(stream, folder / stream.name)
+    shutil.rmtree(folder / "demo")
+    (folder / "private").mkdir()
+
+
+def shell_lines(code):
+    """One command a line; what a command is to write must not be there."""
+    for line in code.splitlines():
+        command = line.split("#")[0].strip() if "'" not in line else line.strip()
+        if command:
+            yield command
+
+
+def run_shell(block, folder, environment, has_viewer):
+    printed = ""
+    for command in shell_lines(block.code):
+        script = command.split()[0]
+        if script.startswith("scripts/") or script in ("cmake", "ctest") or " pip wheel " in command:  # other tests do
+            if script.startswith("scripts/") and not os.access(ROOT / script, os.X_OK):
+                return f"{script} is no script", printed
+            continue
+        if "zulm view" in command and not has_viewer:
+            continue
+        for output in re.findall(r"-o (\S+)", command):
+            shutil.rmtree(folder / output, ignore_errors=True)
+            (folder / output).unlink(missing_ok=True)
+        ended = subprocess.run(["bash", "-o", "pipefail", "-c", command], cwd=folder, env=environment,
+                               capture_output=True, text=True, timeout=120)
+        printed += ended.stdout
+        if ended.returncode not in FINE:
+            return f"`{command}` ended with {ended.returncode}: {ended.stderr}", printed
+    return None, printed
+
+
+def run_program(command, folder, environment):
+    ended = subprocess.run(command, cwd=folder, env=environment, capture_output=True, text=True, timeout=120)
+    complaint = f"ended with {ended.returncode}: {ended.stderr}" if ended.returncode or ended.stderr else None
+    return complaint, ended.stdout
+
+
+def run(page, program, zulm, python_path, viewer):
+    has_viewer = viewer == "1"
+    environment = os.environ | {"PATH": f"{pathlib.Path(zulm).parent}:{os.environ['PATH']}", "PYTHONPATH": python_path,
+                                "LC_ALL": "C.UTF-8"}
+    failures = ran = 0
+    for block in blocks_of(page):
+        if block.language == "python" and not python_path:
+            continue
+        with tempfile.TemporaryDirectory() as folder:
+            folder = pathlib.Path(folder)
+            make_recordings(folder, zulm)
+            if block.language == "cpp":
+                complaint, printed = run_program([program, str(block.line)], folder, environment)
+            elif block.language == "python":
+                complaint, printed = run_program(["/usr/bin/python3", "-c", block.code], folder, environment)
+            else:
+                complaint, printed = run_shell(block, folder, environment, has_viewer)
+        if complaint is None and block.printed is not None and printed != block.printed:
+            complaint = f"printed:\n{printed}"
+        if complaint is not None:
+            print(f"{page.name}:{block.line}: {complaint}")
+            failures += 1
+        ran += 1
+    print(f"{ran} blocks, {failures} of them wrong")
+    return 1 if failures or ran == 0 else 0
+
+
+def main():
+    command, page, *rest = sys.argv[1:]
+    if command == "run":
+        sys.exit(run(pathlib.Path(page), *rest))
+    source = cpp_source(pathlib.Path(page))
+    output = pathlib.Path(rest[0])
+    if not output.exists() or output.read_text(encoding="utf-8") != source:
+        output.write_text(source, encoding="utf-8")
+
+
+main()
