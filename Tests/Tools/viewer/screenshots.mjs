@@ -16,6 +16,7 @@ async function take(name, options, show) {
   await ready(page);
   await page.waitForTimeout(400);
   await show(page);
+  await page.evaluate(() => document.activeElement?.blur());
   await page.waitForTimeout(500);
   await page.screenshot({ path: join(output, `${name}.png`) });
   await close();

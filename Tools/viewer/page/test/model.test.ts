@@ -168,7 +168,7 @@ test('numbers and times in words', () => {
   assert.equal(spokenTime(3661.5), '1 hour 1 minute 1.5 seconds');
   assert.equal(spokenTime(0), '0 seconds');
   assert.equal(bytes(1), '1 byte');
-  assert.equal(bytes(1536), '1.50 KiB');
+  assert.equal(bytes(1536), '1.5 kB');
   assert.equal(plural(1234, 'entry', 'entries'), '1,234 entries');
   assert.equal(titleOf('topmostAppName'), 'Topmost app name');
   assert.equal(titleOf('cpuUsage'), 'CPU usage');

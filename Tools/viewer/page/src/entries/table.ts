@@ -24,7 +24,7 @@ function leastWidth(rows: Rows, column: number): number {
   if (column === 0) return 4.75;
   if (name === 'kind') return 8;
   if (!isNumber) return 7;
-  let longest = title.length;
+  let longest = Math.min(title.length, 9); // which may be cut
   const step = Math.max(1, Math.floor(rows.count / sampled));
   for (let row = 0; row < rows.count; row += step) longest = Math.max(longest, rows.cell(row, column).length);
   return Math.max(3.5, Math.min(longest, 22) * letter);

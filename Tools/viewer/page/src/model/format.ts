@@ -34,14 +34,12 @@ export function plural(value: number, one: string, many = one + 's'): string {
   return `${count(value)} ${value === 1 ? one : many}`;
 }
 
+/// As the tool has them.
 export function bytes(value: number): string {
-  const units = ['bytes', 'KiB', 'MiB', 'GiB', 'TiB'];
+  const units = ['bytes', 'kB', 'MB', 'GB', 'TB'];
   let unit = 0;
-  while (value >= 1024 && unit < units.length - 1) {
-    value /= 1024;
-    ++unit;
-  }
-  return unit === 0 ? plural(value, 'byte') : `${value.toFixed(value < 10 ? 2 : 1)} ${units[unit]}`;
+  for (; value >= 1000 && unit < units.length - 1; ++unit) value /= 1000;
+  return unit === 0 ? plural(value, 'byte') : `${value.toFixed(1)} ${units[unit]}`;
 }
 
 /// A kind's name as a title: "cursorLocation" is "Cursor location".

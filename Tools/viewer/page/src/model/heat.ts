@@ -24,15 +24,18 @@ export function heatOf(track: Track | undefined, placement: Placement, from: num
     const stay = Math.min(track.endOf(i, to), to) - Math.max(track.times[i]!, from);
     cells[line * heatWidth + column]! += Math.max(0, Math.min(stay, longestRest));
   }
-  return normalised(softened(softened(cells)));
+  return normalised(softened(cells));
 }
 
-/// By a small box in each direction.
+const passes = 4; // from which on nobody sees the corners of the box any more
+
+/// By a small box in each direction, so often that every spot is round.
 function softened(cells: Float32Array): Float32Array {
-  return boxed(boxed(cells, 1, heatWidth), heatWidth, heatHeight);
+  for (let i = 0; i < passes; ++i) cells = boxed(boxed(cells, 1, heatWidth), heatWidth, heatHeight);
+  return cells;
 }
 
-const radius = 3;
+const radius = 2;
 
 /// Cells outside the grid count as empty.
 function boxed(cells: Float32Array, step: number, length: number): Float32Array {

@@ -219,12 +219,15 @@ function ring(context: Context, centre: Point, radius: number, width: number, co
   context.globalAlpha = 1;
 }
 
+const usualCursor = 32; // units of the screen from the hot spot to the right edge
+
 function chip(context: Context, { unit, font, placement }: Scene, text: string, centre: Point): void {
   context.font = `600 ${11 * unit}px ${font}`;
   context.textBaseline = 'middle';
   const width = context.measureText(text).width + 12 * unit;
   const height = 19 * unit;
-  const x = Math.max(0, Math.min(centre.x + 20 * unit, placement.frame.width - width));
+  const besideCursor = Math.max(20 * unit, usualCursor * pixelsPerUnit(placement).x);
+  const x = Math.max(0, Math.min(centre.x + besideCursor, placement.frame.width - width));
   const y = Math.max(0, Math.min(centre.y + 18 * unit, placement.frame.height - height));
   context.fillStyle = 'rgb(16 18 24 / 85%)';
   context.beginPath();
