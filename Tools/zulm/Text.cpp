@@ -33,7 +33,8 @@ std::string printable(std::string_view bytes) {
 std::string withoutControls(const std::string& bytes) {
     std::string result;
     for (std::size_t i = 0; i < bytes.size(); ++i) {
-        const bool isControl = (bytes[i] >= '\0' && bytes[i] < ' ') || bytes[i] == '\x7f';
+        const auto byte = static_cast<unsigned char>(bytes[i]);
+        const bool isControl = byte < 0x20 || byte == 0x7f;
         if (isUpperControl(std::string_view(bytes).substr(i))) {
             result += escaped(bytes[i + 1]);
             ++i;
