@@ -124,6 +124,7 @@ ZULMETADATA_API std::ostream& operator<<(std::ostream& stream, const KeyStroke& 
 /// Shows the address of the image bytes, as a signed number, instead of the bytes.
 ZULMETADATA_API std::ostream& operator<<(std::ostream& stream, const CursorImage& image);
 
+/// Exactly one of these types.
 template <class T, class... Types>
 concept OneOf = (std::same_as<T, Types> || ...);
 

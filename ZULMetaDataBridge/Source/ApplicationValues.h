@@ -12,12 +12,14 @@
 
 namespace ZULMetaData {
 
+/// Has the shape of a point of the platform.
 template <class R>
 concept PlatformPoint = requires(const R& r) {
     { r.x } -> std::convertible_to<double>;
     { r.y } -> std::convertible_to<double>;
 };
 
+/// Has the shape of a rectangle of the platform.
 template <class R>
 concept PlatformRect = requires(const R& r) {
     { r.origin } -> PlatformPoint;
@@ -25,6 +27,7 @@ concept PlatformRect = requires(const R& r) {
     { r.size.height } -> std::convertible_to<double>;
 };
 
+/// Has the shape of a media time of the platform.
 template <class R>
 concept PlatformTime = requires(const R& r) {
     { r.value } -> std::convertible_to<std::int64_t>;
