@@ -3,29 +3,46 @@
 #include "Platform/PNGCodec.h"
 #include "Platform/TIFFCodec.h"
 
+#include <cerrno>
+#include <new>
 #include <utility>
 
 namespace ZULMetaData {
+
+namespace {
+
+/// The libraries of the codecs get memory from the C library, and tell one that has none like a damaged picture.
+template <class Work>
+auto orOutOfMemory(Work work) {
+    errno = 0;
+    auto result = work();
+    if (errno == ENOMEM) {
+        throw std::bad_alloc();
+    }
+    return result;
+}
+
+} // namespace
 
 Image::Image(std::uint32_t width, std::uint32_t height, std::vector<std::uint8_t> rgba)
     : width_(width), height_(height), rgba_(std::move(rgba)) {}
 
 std::optional<Image> Image::fromEncodedBytes(std::span<const std::uint8_t> encoded) {
-    return hasPNGSignature(encoded) ? decodePNG(encoded) : decodeTIFF(encoded);
+    return orOutOfMemory([&] { return hasPNGSignature(encoded) ? decodePNG(encoded) : decodeTIFF(encoded); });
 }
 
 std::optional<EncodedImageInfo> Image::infoOfEncodedBytes(std::span<const std::uint8_t> encoded) {
-    return hasPNGSignature(encoded) ? readPNGInfo(encoded) : readTIFFInfo(encoded);
+    return orOutOfMemory([&] { return hasPNGSignature(encoded) ? readPNGInfo(encoded) : readTIFFInfo(encoded); });
 }
 
 std::vector<std::uint8_t> Image::tiffRepresentation() const {
-    return encodeTIFF(*this);
+    return orOutOfMemory([&] { return encodeTIFF(*this); });
 }
 
 BitmapImageRep::BitmapImageRep(Image image) : image_(std::move(image)) {}
 
 std::optional<BitmapImageRep> BitmapImageRep::fromTIFF(std::span<const std::uint8_t> tiff) {
-    auto image = decodeTIFF(tiff);
+    auto image = orOutOfMemory([&] { return decodeTIFF(tiff); });
     if (!image) {
         return std::nullopt;
     }
@@ -33,7 +50,7 @@ std::optional<BitmapImageRep> BitmapImageRep::fromTIFF(std::span<const std::uint
 }
 
 std::vector<std::uint8_t> BitmapImageRep::pngRepresentation() const {
-    return encodePNG(image_);
+    return orOutOfMemory([&] { return encodePNG(image_); });
 }
 
 } // namespace ZULMetaData

@@ -2,7 +2,7 @@
 
 // A picture in memory and the bitmap made from its TIFF data: with them a cursor image becomes PNG bytes and comes
 // back. Everything happens in memory. What a codec cannot read or write is "no image", without a message; only
-// std::bad_alloc, for pixels that memory has no room for, leaves these functions as an exception.
+// std::bad_alloc, where memory ends, leaves these functions as an exception.
 
 #include "SharedDependencies/Export.h"
 
@@ -20,6 +20,7 @@ struct EncodedImageInfo {
     std::uint64_t decodingMemory; ///< bytes that decoding asks for at most, beside the encoded ones
 };
 
+/// Pixels of red, green, blue and straight alpha.
 class ZULMETADATA_API Image {
 public:
     /// `rgba` holds width * height pixels of four bytes (red, green, blue, straight alpha), rows from the top without
