@@ -3,19 +3,18 @@
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Help.h"
 #include "Tools/zulm/Manual.h"
+#include "Tools/zulm/OutOfMemory.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <cstdio>
 #include <filesystem>
 #include <iterator>
 #include <memory>
 #include <new>
 #include <sstream>
-#include <string_view>
 #include <system_error>
 
 namespace Zulm {
@@ -144,11 +143,6 @@ ExitCode runCommandLine(int argc, char** argv, const std::vector<CommandGroup>& 
     if (!format.empty())
         return generate(app, format);
     return chosen ? run(chosen) : refuse(app, "which command?");
-}
-
-void complainAboutMemory() noexcept {
-    constexpr std::string_view line = "zulm: out of memory\n";
-    std::fwrite(line.data(), 1, line.size(), stderr);
 }
 
 } // namespace Zulm

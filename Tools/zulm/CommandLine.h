@@ -17,7 +17,4 @@ struct CommandGroup {
 /// Parses the command line and runs what it asks for. Whatever goes wrong ends in a message and an exit code.
 ExitCode runCommandLine(int argc, char** argv, const std::vector<CommandGroup>& groups);
 
-/// Asks for no memory itself.
-void complainAboutMemory() noexcept;
-
 } // namespace Zulm

@@ -4,6 +4,7 @@
 // first, and how all of it is said.
 
 #include "Tools/zulm/Command.h"
+#include "Tools/zulm/OutOfMemory.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
 #include <nlohmann/json.hpp>
@@ -58,6 +59,7 @@ public:
     auto save(const std::string& what, Work work) {
         try {
             makeCopy();
+            const MemoryRunsOutByException undoing;
             auto result = work(ZULMetaData::SafeMovieSave(path_, progress(what)));
             commit();
             return result;
