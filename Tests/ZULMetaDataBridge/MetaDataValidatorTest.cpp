@@ -437,6 +437,16 @@ TEST(MetaDataValidator, ThrowsForWhatIsNoFileToRead) {
     EXPECT_THROW(validateRecording(stream, MetaDataParser::Unknown), std::runtime_error);
 }
 
+TEST(MetaDataValidator, TellsWhyAFileCannotBeOpened) {
+    const TemporaryFolder folder;
+    try {
+        validateRecording(folder / "Missing.mp4");
+        FAIL();
+    } catch (const std::runtime_error& error) {
+        EXPECT_STREQ(error.what(), "cannot be opened: No such file or directory");
+    }
+}
+
 TEST(MetaDataValidator, ThrowsWhereTheDeviceFails) {
     struct FailingBuffer final : WatchedBuffer {
         using WatchedBuffer::WatchedBuffer;

@@ -120,10 +120,8 @@ void requireFree(const std::vector<std::string>& outputs, bool force) {
 void writePart(const std::string& input, std::uint64_t offset, std::uint64_t size, const std::string& output,
                bool force) {
     OutputFile file(output, {input}, force);
-    std::ifstream from;
-    std::ofstream to;
-    fileOpen(from, input.c_str(), std::ios::binary);
-    fileOpen(to, file.temporaryPath().c_str(), std::ios::binary | std::ios::trunc);
+    std::ifstream from = openInput(input);
+    std::ofstream to = openOutput(file.temporaryPath(), output + ":");
     Progress progress("writing " + output, size);
     std::vector<char> piece(s_pieceSize);
     from.seekg(static_cast<std::streamoff>(offset));

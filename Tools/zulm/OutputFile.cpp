@@ -11,7 +11,6 @@
 #include <cstring>
 #include <fcntl.h>
 #include <filesystem>
-#include <fstream>
 #include <system_error>
 #include <unistd.h>
 #include <utility>
@@ -78,10 +77,8 @@ const std::string& OutputFile::temporaryPath() const {
 }
 
 void OutputFile::copyFrom(const std::string& source) {
-    std::ifstream from;
-    std::ofstream to;
-    fileOpen(from, source.c_str(), std::ios::binary);
-    fileOpen(to, temporaryPath().c_str(), std::ios::binary | std::ios::trunc);
+    std::ifstream from = openInput(source);
+    std::ofstream to = openOutput(temporaryPath(), path_ + ":");
     Progress progress("copying " + source, fs::file_size(source));
     std::vector<char> piece(1 << 20);
     while (from.read(piece.data(), static_cast<std::streamsize>(piece.size())), from.gcount() > 0) {
@@ -105,13 +102,28 @@ void OutputFile::commit() {
 void writeWholeFile(const std::string& path, const std::string& contents, const std::vector<std::string>& inputs,
                     bool force) {
     OutputFile file(path, inputs, force);
-    std::ofstream stream;
-    fileOpen(stream, file.temporaryPath().c_str(), std::ios::binary | std::ios::trunc);
+    std::ofstream stream = openOutput(file.temporaryPath(), path + ":");
     stream.write(contents.data(), static_cast<std::streamsize>(contents.size()));
     stream.close();
     if (!stream)
         throw Failure(failureText(path, "cannot be written"));
     file.commit();
+}
+
+std::ifstream openInput(const std::string& path) {
+    std::ifstream file;
+    fileOpen(file, path.c_str(), std::ios::binary);
+    if (!file.is_open())
+        throw Failure(failureText(path, "cannot be opened"));
+    return file;
+}
+
+std::ofstream openOutput(const std::string& path, const std::string& subject) {
+    std::ofstream file;
+    fileOpen(file, path.c_str(), std::ios::binary | std::ios::trunc);
+    if (!file.is_open())
+        throw Failure(fmt::format("{} cannot be written: {}", subject, std::strerror(errno)));
+    return file;
 }
 
 bool isSameFile(const std::string& left, const std::string& right) {

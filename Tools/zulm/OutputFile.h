@@ -2,6 +2,7 @@
 
 // Files that appear whole or not at all.
 
+#include <fstream>
 #include <memory>
 #include <string>
 #include <vector>
@@ -37,6 +38,12 @@ private:
 /// Writes `contents` as a whole file. Throws `Failure` as `OutputFile` does.
 void writeWholeFile(const std::string& path, const std::string& contents, const std::vector<std::string>& inputs,
                     bool force);
+
+/// Throws `Failure`.
+std::ifstream openInput(const std::string& path);
+
+/// Empties a file to write into it. Throws `Failure`, which calls it `subject`: "FILE:" or "FILE: the copy".
+std::ofstream openOutput(const std::string& path, const std::string& subject);
 
 /// Whether both paths are the same file.
 bool isSameFile(const std::string& left, const std::string& right);

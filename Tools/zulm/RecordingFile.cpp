@@ -3,6 +3,8 @@
 
 #include <fmt/core.h>
 
+#include <cerrno>
+#include <cstring>
 #include <iostream>
 #include <utility>
 
@@ -31,13 +33,15 @@ Recording::Recording(std::string path, std::string name) : path_(std::move(path)
     if (name_.empty())
         name_ = path_;
     requireFile(path_);
+    if (MetaDataParser::streamTypeOf(path_) == MetaDataParser::Unknown)
+        throw Failure(
+            fmt::format("{}: not a movie (.mp4, .mov, .zcap), a RIFF file (.avi, .wav) or a stream (.dat)", name_));
     {
         const Muted libraryMessages(std::cerr); // they name no file; the tool says the same in its own words
         parser_ = MetaDataParser::create(path_);
     }
     if (!parser_)
-        throw Failure(
-            fmt::format("{}: not a movie (.mp4, .mov, .zcap), a RIFF file (.avi, .wav) or a stream (.dat)", name_));
+        throw Failure(fmt::format("{}: cannot be opened: {}", name_, std::strerror(errno)));
     requireRead(parser_->getStream(), name_);
     say(fmt::format("{}: {} with {} streams", name_, container(), parser_->getAvailableMetaDataUUIDs().size()));
 }

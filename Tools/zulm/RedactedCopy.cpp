@@ -1,5 +1,6 @@
 #include "Tools/zulm/RedactedCopy.h"
 
+#include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/TemporaryFile.h"
 #include "Tools/zulm/Text.h"
@@ -139,8 +140,7 @@ void RedactedCopy::write(const std::string& output) {
 }
 
 void RedactedCopy::writeStreams(const std::string& file) {
-    std::ofstream output;
-    fileOpen(output, file.c_str(), std::ios::binary | std::ios::trunc);
+    std::ofstream output = openOutput(file, recording_.name() + ": the copy");
     for (const HeldStream& held : heldStreams(recording_)) {
         const auto begin = static_cast<std::uint64_t>(output.tellp());
         const StreamSource source = StreamSource::part(recording_.path(), held.offset, held.present);
@@ -155,8 +155,7 @@ void RedactedCopy::writeStreams(const std::string& file) {
 }
 
 void RedactedCopy::writeMovie(const std::string& output, const std::string& streamFile) const {
-    std::ofstream file;
-    fileOpen(file, output.c_str(), std::ios::binary | std::ios::trunc);
+    std::ofstream file = openOutput(output, recording_.name() + ": the copy");
     writeItems(file);
     finish(file, output, recording_.name());
     std::vector<StreamSource> sources;
@@ -176,11 +175,9 @@ void RedactedCopy::writeRIFF(const std::string& output, const std::string& strea
         size += detail::s_chunkHeaderSize + padded(part.size);
     if (size > s_most32)
         throw Failure(fmt::format("{}: {} bytes of metadata are more than a chunk can hold", recording_.name(), size));
-    std::ofstream file;
-    fileOpen(file, output.c_str(), std::ios::binary | std::ios::trunc);
+    std::ofstream file = openOutput(output, recording_.name() + ": the copy");
     writeItems(file);
-    std::ifstream streams;
-    fileOpen(streams, streamFile.c_str(), std::ios::binary);
+    std::ifstream streams = openInput(streamFile);
     Progress progress("writing the metadata", size);
     if (!parts_.empty())
         writeBytes(file, detail::chunkHeader(detail::s_metaDataAtom, static_cast<std::uint32_t>(size)));

@@ -1,5 +1,6 @@
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Report.h"
@@ -34,8 +35,7 @@ const char* originText(SalvagedStream::Origin origin) {
 }
 
 SalvageReport search(const std::string& path) {
-    std::ifstream file;
-    fileOpen(file, path.c_str(), std::ios::binary);
+    std::ifstream file = openInput(path);
     Progress progress("searching " + path, std::filesystem::file_size(path));
     return orUnreadable(path, [&] {
         return StreamSalvage(file, MetaDataParser::streamTypeOf(path),

@@ -50,8 +50,7 @@ std::string pageFor(const ViewOptions& options) {
     if (options.page.empty())
         return std::string(builtInPage());
     requireFile(options.page);
-    std::ifstream file;
-    fileOpen(file, options.page.c_str(), std::ios::binary);
+    std::ifstream file = openInput(options.page);
     std::string page(std::filesystem::file_size(options.page), '\0');
     file.read(page.data(), static_cast<std::streamsize>(page.size()));
     requireRead(file, options.page);
@@ -78,22 +77,20 @@ void write(std::ofstream& stream, std::string_view bytes) {
 /// In pieces that end where a group of base64 does.
 void writeMovie(std::ofstream& stream, const std::string& movie, const std::string& name) {
     constexpr std::size_t pieceSize = std::size_t{3} << 18;
-    std::ifstream from;
-    fileOpen(from, movie.c_str(), std::ios::binary);
+    std::ifstream from = openInput(movie);
     Progress progress("embedding " + name, std::filesystem::file_size(movie));
     std::vector<char> piece(pieceSize);
     while (from.read(piece.data(), static_cast<std::streamsize>(piece.size())), from.gcount() > 0) {
         write(stream, base64({piece.data(), static_cast<std::size_t>(from.gcount())}));
         progress.advance(static_cast<std::uint64_t>(from.gcount()));
     }
-    if (from.bad() || !from.is_open())
+    if (from.bad())
         throw Failure(fmt::format("{}: cannot be read", name));
 }
 
 void writePage(const ViewOptions& options, const InputFile& input, const PageParts& page, const Json& document) {
     OutputFile file(options.output, {input.path(), options.page}, options.force);
-    std::ofstream stream;
-    fileOpen(stream, file.temporaryPath().c_str(), std::ios::binary | std::ios::trunc);
+    std::ofstream stream = openOutput(file.temporaryPath(), options.output + ":");
     const std::string text = scriptText(document);
     const std::size_t end = options.embed ? text.size() - std::strlen("\"}") : text.size(); // behind the address
     write(stream, page.front());

@@ -6,8 +6,10 @@
 #include "ZULMetaDataBridge/Source/Validation/UntrustedInput.h"
 
 #include <algorithm>
+#include <cerrno>
 #include <fstream>
 #include <stdexcept>
+#include <system_error>
 
 namespace ZULMetaData {
 
@@ -30,7 +32,7 @@ ValidationReport validateRecording(const FileLocation& file) {
     std::ifstream stream;
     fileOpen(stream, path.c_str(), std::ios_base::in | std::ios_base::binary);
     if (!stream.is_open())
-        throw std::runtime_error("cannot be opened");
+        throw std::system_error(errno, std::generic_category(), "cannot be opened");
     return validateRecording(stream, type);
 }
 
