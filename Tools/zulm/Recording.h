@@ -11,9 +11,11 @@
 #include <fmt/core.h>
 #include <nlohmann/json.hpp>
 
+#include <cerrno>
 #include <cstdint>
 #include <istream>
 #include <memory>
+#include <new>
 #include <optional>
 #include <string>
 #include <system_error>
@@ -46,6 +48,24 @@ auto orUnreadable(const std::string& name, Work work) {
         throw Failure(fmt::format("{}: cannot be read: {}", name, error.code().message()));
     }
 }
+
+/// Hands entries on. A reader leaves an image out that it gets no memory for; this throws `std::bad_alloc`.
+template <class Value>
+class WithTheirImages final : public ZULMetaData::DataStreamObserver<Value> {
+public:
+    explicit WithTheirImages(ZULMetaData::DataStreamObserver<Value>& observer) : observer_(observer) { errno = 0; }
+
+    bool dataRead(double time, const Value& value) override {
+        if (errno == ENOMEM)
+            throw std::bad_alloc();
+        const bool goesOn = observer_.dataRead(time, value);
+        errno = 0;
+        return goesOn;
+    }
+
+private:
+    ZULMetaData::DataStreamObserver<Value>& observer_;
+};
 
 class Recording {
 public:
@@ -83,7 +103,8 @@ public:
     /// Delivers the entries of a decodable stream as far as they are whole.
     template <class Value>
     void readEntries(const StreamInfo& stream, ZULMetaData::DataStreamObserver<Value>& observer) {
-        ZULMetaData::MetaDataReader<Value>::parseStream(observer, parser_->getStream(), stream.range.offset,
+        WithTheirImages<Value> whole(observer);
+        ZULMetaData::MetaDataReader<Value>::parseStream(whole, parser_->getStream(), stream.range.offset,
                                                         stream.readableBytes, -1);
         requireRead(parser_->getStream(), name_);
     }
