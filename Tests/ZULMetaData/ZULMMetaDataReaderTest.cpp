@@ -32,6 +32,7 @@ namespace {
 using testing::Each;
 using testing::ElementsAre;
 using testing::IsEmpty;
+using testing::SizeIs;
 
 using Texts = std::list<std::string>;
 
@@ -553,6 +554,11 @@ TEST(ListReader, DeliversAListAtTimeZero) {
     MetaDataReader<Texts>::parseStream(lists, stream, 0, 24 + 2 * s_list.size(), -1);
     EXPECT_THAT(lists.times, ElementsAre(0.0, 0.0));
     EXPECT_THAT(lists.values, Each(Texts{"a", "bc"}));
+}
+
+TEST(ListReader, ReadsOnlyTheListsOfItsStretch) {
+    std::istringstream container(streamHeader("2b7b6afc", 1, 0) + s_list + s_list + s_list);
+    EXPECT_THAT(readStream<Texts>(container, 0, 24 + 2 * s_list.size()).entries, SizeIs(2));
 }
 
 TEST(ListReader, LeavesTheTimeAlone) {
