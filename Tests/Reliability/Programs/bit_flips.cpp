@@ -1,7 +1,6 @@
 // bit_flips FOLDER PART PARTS RANDOM FILE...: flips every bit of each file, then three bits at random places RANDOM
 // times, and does everything with what comes of it. Of the bits, every PARTS-th from the one numbered PART on is its
-// own. Prints "CASES DEMANDING", and on standard error what does not hold. Where RANDOM is 0, the parsers of files take
-// turns instead of reading each case all together.
+// own. Prints "CASES DEMANDING", and on standard error what does not hold. The parsers of files take turns.
 
 #include "Tests/Reliability/Programs/Exercise.h"
 #include "Tests/Reliability/Programs/Watch.h"
@@ -25,9 +24,9 @@ void flip(std::string& bytes, std::size_t bit) {
 
 class Flipper {
 public:
-    Flipper(const std::string& folder, const std::string& file, Exercise::FileParsers parsers)
+    Flipper(const std::string& folder, const std::string& file)
         : name_(std::filesystem::path(file).filename().string()), original_(contentsOf(file)),
-          exercise_(folder, std::filesystem::path(file).extension().string(), parsers) {}
+          exercise_(folder, std::filesystem::path(file).extension().string(), Exercise::InTurn) {}
 
     void flipEach(std::size_t part, std::size_t parts) {
         for (std::size_t bit = part; bit < bits(); bit += parts)
@@ -84,7 +83,7 @@ int main(int argc, char** argv) {
     std::uint64_t cases = 0;
     std::uint64_t demanding = 0;
     for (int i = firstFile; i < argc; ++i) {
-        Flipper flipper(argv[1], argv[i], randomCases > 0 ? Exercise::EachTime : Exercise::InTurn);
+        Flipper flipper(argv[1], argv[i]);
         flipper.flipEach(part, number(3));
         flipper.flipAtRandom(randomCases / static_cast<std::uint64_t>(argc - firstFile), random);
         cases += flipper.cases();
