@@ -2,12 +2,18 @@
 
 import concurrent.futures
 import dataclasses
+import os
+import pathlib
 import re
+import shutil
 
 import check
 import recordings
+from faults import files_in, write_files
+from recordings import fast_folder
 
 WORKERS = 2
+BATCH = 100  # runs of the tool whose files are there at a time
 FAILED = 1  # the tool's exit code
 SLACK = 300  # allocations that --version itself needs at most, behind those that all commands begin with
 OUT_OF_MEMORY = re.compile(rb"out of memory|Cannot allocate memory")
@@ -39,35 +45,49 @@ class Command:
         return "zulm " + " ".join(self.words)
 
 
+@dataclasses.dataclass
+class Ended:
+    """A run of the tool: how it ended, and what it left."""
+
+    code: int  # negative where a signal ended it
+    output: bytes
+    errors: bytes
+    left: dict[str, bytes]
+
+
 class Tool:
-    def __init__(self, context, folder):
-        self.zulm = context.zulm
+    """Runs a command in folders of its own."""
+
+    def __init__(self, context, folder, command):
+        self.program = context.zulm
         self.shim = context.program("AllocationShim.so")
         self.folder = folder
-        self.count = folder.with_suffix(".count")
+        self.command = command
 
-    def run(self, command, number, all_behind):
-        """Fills the folder anew, and gives what the tool did and what it left there."""
-        self.empty()
-        for name, contents in command.files.items():
-            (self.folder / name).write_bytes(contents)
-        done = check.run([self.zulm, *command.words], cwd=self.folder, stdin=check.subprocess.DEVNULL, environment={
-            "LD_PRELOAD": str(self.shim), "ALLOCATION_FAILS": str(number),
-            "ALLOCATION_FAILS_BEHIND": str(int(all_behind)), "ALLOCATION_COUNT": str(self.count)})
-        return done, self.contents()
+    def run(self, environment):
+        return check.run([self.program, *self.command.words], cwd=self.folder, stdin=check.subprocess.DEVNULL,
+                         environment={"LD_PRELOAD": str(self.shim)} | environment)
 
-    def contents(self):
-        files = (path for path in sorted(self.folder.rglob("*")) if path.is_file())
-        return {str(path.relative_to(self.folder)): path.read_bytes() for path in files}
+    def measure(self):
+        """Fills in what the command does with all the memory there is."""
+        write_files(self.folder, self.command.files)
+        done = self.run({"ALLOCATION_COUNT": str(self.folder.with_suffix(".count"))})
+        self.command.code, self.command.output = done.returncode, done.stdout
+        self.command.left = files_in(self.folder)
+        self.command.allocations = int(self.folder.with_suffix(".count").read_text())
 
-    def empty(self):
-        for path in sorted(self.folder.rglob("*"), reverse=True):
-            path.rmdir() if path.is_dir() else path.unlink()
-
-    def measure(self, command):
-        done, command.left = self.run(command, 0, False)
-        command.code, command.output = done.returncode, done.stdout
-        command.allocations = int(self.count.read_text())
+    def fail(self, numbers, all_behind):
+        """Gives, of each number, how the run ended whose allocation of this number failed."""
+        shutil.rmtree(self.folder)
+        for number in numbers:
+            write_files(self.folder / str(number) / "files", self.command.files)
+        done = self.run({"ALLOCATION_FIRST": str(numbers[0]), "ALLOCATION_LAST": str(numbers[-1]),
+                         "ALLOCATION_STEP": str(numbers.step), "ALLOCATIONS_BEHIND": str(int(all_behind))})
+        for line in done.stdout.splitlines():
+            number, status = map(int, line.split())
+            place = self.folder / str(number)
+            yield number, Ended(os.waitstatus_to_exitcode(status), (place / "output").read_bytes(),
+                                (place / "errors").read_bytes(), files_in(place / "files"))
 
 
 def commands(context):
@@ -93,62 +113,69 @@ def commands(context):
         Command(["attach", "m.mp4", "a.dat", "b.dat", "-o", "o.mp4"], attached),
         Command(["attach", "m.mp4", "a.dat", "b.dat", "--in-place"], attached),
         Command(["repair", "--in-place", "m.mp4"], {"m.mp4": bare}),
+        Command(["view", "r.mp4", "-o", "o.html", "--page", "p.html"], recorded | {"p.html": b"<head></head>"}),
         Command(["stamp", "--in-place", "m.mp4", "--creator", "C", "--creator-version", "1"], {"m.mp4": bare}),
     ]
 
 
-def complaint(command, done, left):
+def complaint(command, ended):
     """What is wrong about a run in which an allocation failed; None where it is as it should be."""
-    error = done.stderr.decode(errors="replace").strip()
-    if done.returncode < 0:
-        return f"was ended by signal {-done.returncode}: {error}"
-    if done.returncode == command.code and done.stdout == command.output and left == command.left:
+    error = ended.errors.decode(errors="replace").strip()
+    if ended.code < 0:
+        return f"was ended by signal {-ended.code}: {error}"
+    if (ended.code, ended.output, ended.left) == (command.code, command.output, command.left):
         return None  # there was another way
-    if done.returncode != FAILED:
-        return f"ended with {done.returncode} and a wrong result: {error}"
-    if not OUT_OF_MEMORY.search(done.stderr):
+    if ended.code != FAILED:
+        return f"ended with {ended.code} and a wrong result: {error}"
+    if not OUT_OF_MEMORY.search(ended.errors):
         return f"ended with 1, but said {error!r}"
+    left = ended.left
     wrong = {name for name, contents in left.items() if contents not in (command.files.get(name), command.left.get(name))}
     wrong |= {name for name in command.files if name not in left}
     return f"left {', '.join(sorted(wrong))} as nothing that it should be" if wrong else None
 
 
-def check_command(context, command, first, result):
+def check_command(folder, context, command, first):
     """Of a command the allocations from `first` on; in front of it all commands do the same."""
-    folder = context.folder / re.sub(r"\W+", "-", command.name())
-    folder.mkdir()
-    tool = Tool(context, folder)
-    tool.measure(command)
+    result = check.Result()
+    tool = Tool(context, folder / re.sub(r"\W+", "-", command.name()), command)
+    tool.measure()
     for all_behind in (False, True):
-        for number in range(first, command.allocations + 1):
-            done, left = tool.run(command, number, all_behind)
-            result.cases += 1
-            result.crashed += done.returncode < 0
-            if wrong := complaint(command, done, left):
-                behind = " and all behind it" if all_behind else ""
-                result.failures.append(f"{command.name()}, allocation {number}{behind}: {wrong}")
+        before = result.cases
+        numbers = range(first, command.allocations + 1, 4 if all_behind and not context.full else 1)
+        for start in range(0, len(numbers), BATCH):
+            for number, ended in tool.fail(numbers[start:start + BATCH], all_behind):
+                result.cases += 1
+                result.crashed += ended.code < 0
+                if wrong := complaint(command, ended):
+                    behind = " and all behind it" if all_behind else ""
+                    result.failures.append(f"{command.name()}, allocation {number}{behind}: {wrong}")
+        if result.cases - before != len(numbers):
+            result.failures.append(f"{command.name()}: ran {result.cases - before} of {len(numbers)} times")
     return result
 
 
-def allocations_of_the_command_line(context):
+def allocations_of_the_command_line(folder, context):
     """What every command begins with: the making of the command line, which --version does and no more."""
-    folder = context.folder / "version"
-    folder.mkdir()
     command = Command(["--version"], {})
-    Tool(context, folder).measure(command)
+    Tool(context, folder / "version", command).measure()
     return command.allocations
+
+
+def run_tool(context, result):
+    with fast_folder() as name, concurrent.futures.ThreadPoolExecutor(WORKERS) as pool:
+        folder = pathlib.Path(name)
+        common = allocations_of_the_command_line(folder, context)
+        jobs = [(Command(["--version"], {}), 1)]
+        jobs += [(command, 1 if context.full else common - SLACK) for command in commands(context)]
+        for part in pool.map(lambda job: check_command(folder, context, *job), jobs):
+            result.cases += part.cases
+            result.crashed += part.crashed
+            result.failures += part.failures
 
 
 def run(context):
     result = check.Result()
-    common = allocations_of_the_command_line(context)
-    jobs = [(Command(["--version"], {}), 1)]
-    jobs += [(command, 1 if context.full else common - SLACK) for command in commands(context)]
-    with concurrent.futures.ThreadPoolExecutor(WORKERS) as pool:
-        library = pool.submit(check_library, context, result)
-        for part in pool.map(lambda job: check_command(context, *job, check.Result()), jobs):
-            result.cases += part.cases
-            result.crashed += part.crashed
-            result.failures += part.failures
-        library.result()
+    check_library(context, result)
+    run_tool(context, result)
     return result

@@ -1,16 +1,26 @@
-// A library for LD_PRELOAD that lets allocations of a program fail, from its main function on.
+// A library for LD_PRELOAD that lets allocations of a program fail, from its main function on. It starts once and
+// forks in front of that: most of a start's time is not the program's own.
 //
-//     ALLOCATION_FAILS=N             the Nth one; 0 is none
-//     ALLOCATION_FAILS_BEHIND=1      and all behind it
-//     ALLOCATION_COUNT=FILE          gets, as a text, how many there have been when the program ends
+//     ALLOCATION_COUNT=FILE          nothing fails; FILE gets, as a text, how many allocations there were
+//
+//     ALLOCATION_FIRST=N             the first one that fails
+//     ALLOCATION_STEP=N              how far behind it the one is that fails in the next process, and so on
+//     ALLOCATION_LAST=N
+//     ALLOCATIONS_BEHIND=1           and all behind it
+//
+// The process whose Nth allocation fails runs in the folder N/files, its output and errors go to N/output and N/errors.
+// On standard output there is a line for each, N and how it ended, as waitpid tells it.
 
 #include "Tests/Reliability/Programs/FailingAllocations.h"
 
 #include <array>
 #include <charconv>
+#include <cstdio>
 #include <cstdlib>
 #include <dlfcn.h>
 #include <fcntl.h>
+#include <string>
+#include <sys/wait.h>
 #include <unistd.h>
 
 namespace {
@@ -34,10 +44,48 @@ void tellCount() {
     close(file);
 }
 
+void lead(int descriptor, const char* path) {
+    const int file = open(path, O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0644);
+    if (dup2(file, descriptor) != descriptor)
+        std::abort();
+    close(file);
+}
+
+void enter(const std::string& folder) {
+    if (chdir(folder.c_str()) != 0)
+        std::abort();
+    lead(STDOUT_FILENO, "output");
+    lead(STDERR_FILENO, "errors");
+    if (chdir("files") != 0)
+        std::abort();
+}
+
+int failEach(int argc, char** argv, char** environment) {
+    const long step = number("ALLOCATION_STEP");
+    const long last = number("ALLOCATION_LAST");
+    const bool andAllBehind = number("ALLOCATIONS_BEHIND") != 0;
+    constexpr unsigned longest = 20; // seconds
+    for (long failing = number("ALLOCATION_FIRST"); failing <= last; failing += step) {
+        const pid_t child = fork();
+        if (child == 0) {
+            enter(std::to_string(failing));
+            alarm(longest);
+            Reliability::failAllocation(failing, andAllBehind);
+            return s_main(argc, argv, environment);
+        }
+        int status = 0;
+        if (child < 0 || waitpid(child, &status, 0) != child)
+            std::abort();
+        dprintf(STDOUT_FILENO, "%ld %d\n", failing, status);
+    }
+    return 0;
+}
+
 int failingMain(int argc, char** argv, char** environment) {
-    if (std::getenv("ALLOCATION_COUNT"))
-        std::atexit(tellCount);
-    Reliability::failAllocation(number("ALLOCATION_FAILS"), number("ALLOCATION_FAILS_BEHIND") != 0);
+    if (std::getenv("ALLOCATION_STEP"))
+        return failEach(argc, argv, environment);
+    std::atexit(tellCount);
+    Reliability::failAllocation(0, false);
     return s_main(argc, argv, environment);
 }
 

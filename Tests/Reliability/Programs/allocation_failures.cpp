@@ -21,8 +21,10 @@
 #include <map>
 #include <memory>
 #include <new>
+#include <optional>
 #include <sstream>
 #include <string>
+#include <system_error>
 #include <unistd.h>
 #include <utility>
 #include <vector>
@@ -223,6 +225,44 @@ Operation recordingPixels(const std::string& folder) {
     return operation;
 }
 
+/// `run` gives its result as a text, which must be what it is with all the memory there is.
+Operation reporting(const std::string& name, std::function<std::string()> run) {
+    const auto expected = std::make_shared<std::string>(run());
+    const auto found = std::make_shared<std::string>();
+    Operation operation{.name = name};
+    operation.run = [=] { *found = run(); };
+    operation.complaint = [=](bool hasThrown) -> std::string {
+        return hasThrown || *found == *expected ? "" : "told something else: " + *found;
+    };
+    operation.clear = [=] { *found = std::string(); };
+    return operation;
+}
+
+std::string pixelsIn(const std::optional<Image>& image) {
+    return image ? std::string(image->rgba().begin(), image->rgba().end()) : "no image";
+}
+
+template <class Bytes>
+std::string asText(const Bytes& bytes) {
+    return {bytes.begin(), bytes.end()};
+}
+
+/// What there is no memory for must not pass for a damaged picture.
+void addPictures(std::vector<Operation>& operations) {
+    const Image picture(2, 1, {255, 0, 0, 255, 0, 255, 0, 128});
+    const auto tiff = picture.tiffRepresentation();
+    const auto bitmap = BitmapImageRep::fromTIFF(tiff);
+    const auto png = bitmap->pngRepresentation();
+    operations.push_back(reporting("encode a TIFF", [=] { return asText(picture.tiffRepresentation()); }));
+    operations.push_back(reporting("encode a PNG", [=] { return asText(bitmap->pngRepresentation()); }));
+    for (const auto& encoded : {tiff, png}) {
+        operations.push_back(reporting("decode a picture", [=] { return pixelsIn(Image::fromEncodedBytes(encoded)); }));
+        operations.push_back(reporting("look at a picture", [=] {
+            return std::to_string(Image::infoOfEncodedBytes(encoded).value_or(EncodedImageInfo{}).decodingMemory);
+        }));
+    }
+}
+
 // ---- movies -----------------------------------------------------------------------------------------------------
 
 /// The media of a movie, open-ended as a recorder leaves it, and closed by a repair.
@@ -370,27 +410,14 @@ void addMovies(std::vector<Operation>& operations, const Movie& movie) {
 
 // ---- damaged files ----------------------------------------------------------------------------------------------
 
-/// `run` gives its result as a text, which must be what it is with all the memory there is.
-Operation reporting(const std::string& name, std::function<std::string()> run) {
-    const auto expected = std::make_shared<std::string>(run());
-    const auto found = std::make_shared<std::string>();
-    Operation operation{.name = name};
-    operation.run = [=] { *found = run(); };
-    operation.complaint = [=](bool hasThrown) -> std::string {
-        return hasThrown || *found == *expected ? "" : "told something else: " + *found;
-    };
-    operation.clear = [=] { *found = std::string(); };
-    return operation;
-}
-
 std::string findingsIn(const std::string& file) {
     std::string text;
     try {
         for (const Finding& finding : validateRecording(file).allFindings())
             text += finding.sentence + '\n';
-    } catch (const std::runtime_error& error) {
-        if (std::string(error.what()) == "cannot be opened")
-            throw std::bad_alloc(); // which is why
+    } catch (const std::system_error& error) {
+        if (error.code() == std::errc::not_enough_memory)
+            throw std::bad_alloc();
         throw;
     }
     return text;
@@ -440,6 +467,7 @@ int main(int argc, char** argv) {
     std::vector<Operation> operations;
     addKinds(operations, folder, recording, everyKind);
     operations.push_back(recordingPixels(folder));
+    addPictures(operations);
     addMovies(operations, movie);
     addDamaged(operations, folder);
     bool isRight = true;
