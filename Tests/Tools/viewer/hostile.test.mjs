@@ -4,7 +4,7 @@ import assert from 'node:assert/strict';
 import { readdirSync, readFileSync, writeFileSync } from 'node:fs';
 import { join } from 'node:path';
 import { test } from 'node:test';
-import { emptyPage, folder, open, opened, recordedSession, setting, state, textOf } from './support.mjs';
+import { emptyPage, folder, open, opened, recordedSession, setting, state, textOf, zulm } from './support.mjs';
 
 const recording = recordedSession();
 const empty = join(folder, 'empty.html');
@@ -31,6 +31,7 @@ test('a file that is no recording is refused in words, and the next one opens', 
   await give(page, text);
   assert.match(await textOf(page, '#notice-text'), /^Letter\.mp4 cannot be shown/);
   assert.equal(await textOf(page, '#recording-name'), 'Recording.mp4'); // stays open
+  assert.equal(await page.evaluate(() => zulmViewer.dump()), zulm('dump', '--format', 'json', 'Recording.mp4'));
   assert.deepEqual(problems, []);
   await close();
 });

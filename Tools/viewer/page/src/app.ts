@@ -114,15 +114,18 @@ export class App {
     document.body.classList.add('is-busy');
     try {
       if (source instanceof Blob && source.size === 0) throw new Error('it is empty');
-      const { decoded, problems } = await this.decoder.open(source, name);
+      const { id, decoded, problems } = await this.decoder.open(source, name);
       if (opening !== this.opened) return;
       mark('zulm:decoded');
       if (decoded.streams.length === 0 && decoded.hidden.length === 0) throw new Error(whyNothing(decoded));
       byId('notice').hidden = true;
       this.show(new Session(complete(decoded)));
+      this.decoder.keep(id);
       if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
     } catch (error) {
-      if (opening === this.opened) this.complain(`${name} cannot be shown: ${wordsOf(error, name)}.`);
+      if (opening !== this.opened) return;
+      this.complain(`${name} cannot be shown: ${wordsOf(error, name)}.`);
+      this.decoder.keep();
     } finally {
       if (opening === this.opened) document.body.classList.remove('is-busy');
       ++this.finished;

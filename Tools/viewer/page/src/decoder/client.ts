@@ -11,6 +11,7 @@ export class DecoderError extends Error {}
 export class Decoder {
   private worker: Worker | undefined;
   private lastId = 0;
+  private kept = 0;
   private readonly waiting = new Map<number, { done: (reply: Reply) => void; failed: (error: Error) => void }>();
 
   /// So that it is there when it is needed.
@@ -19,15 +20,22 @@ export class Decoder {
   }
 
   /// A file is read in slices, as far as needed; a text is the file itself in base64, whose reports are known.
-  async open(source: Blob | string, name: string): Promise<{ decoded: Decoded; problems: string[] }> {
+  async open(source: Blob | string, name: string): Promise<{ id: number; decoded: Decoded; problems: string[] }> {
     const reply = await this.ask({ type: 'open', source, name, reports: typeof source !== 'string' });
     if (reply.type !== 'opened') throw new DecoderError('the decoder answered something else');
     return reply;
   }
 
-  /// All entries as the tool prints them.
+  /// What was opened under this number is what the page shows from now on; without one it stays what it was. Frees
+  /// everything else.
+  keep(id = this.kept): void {
+    this.kept = id;
+    this.ask({ type: 'keep', opened: id }).catch(() => {}); // nothing is left to free
+  }
+
+  /// All entries of what is kept, as the tool prints them.
   async dump(): Promise<string> {
-    const reply = await this.ask({ type: 'dump' });
+    const reply = await this.ask({ type: 'dump', opened: this.kept });
     if (reply.type !== 'dumped') throw new DecoderError('the decoder answered something else');
     return reply.text;
   }

@@ -2,11 +2,14 @@
 
 import type { Decoded } from '../model/session';
 
+/// What was opened is named by the request that opened it; of all that was, `keep` closes the others.
 export type Request =
   | { id: number; type: 'open'; source: Blob | string; name: string; reports: boolean }
-  | { id: number; type: 'dump'; kinds?: string[] };
+  | { id: number; type: 'keep'; opened: number }
+  | { id: number; type: 'dump'; opened: number };
 
 export type Reply =
   | { id: number; type: 'opened'; decoded: Decoded; problems: string[] }
+  | { id: number; type: 'kept' }
   | { id: number; type: 'dumped'; text: string }
   | { id: number; type: 'failed'; message: string };

@@ -4,7 +4,7 @@ import { Recording, ZulmError, type Entries } from '#decoder';
 import type { Decoded } from '../model/session';
 import type { Reply, Request } from './protocol';
 
-let recording: Recording | undefined;
+const recordings = new Map<number, Recording>();
 
 /// In words for a person.
 function wordsOf(error: unknown): string {
@@ -60,16 +60,28 @@ function transferable({ entries, hidden }: Decoded): ArrayBuffer[] {
   return [...buffers];
 }
 
+function keep(id: number): void {
+  for (const [other, recording] of recordings) {
+    if (other === id) continue;
+    recording.close();
+    recordings.delete(other);
+  }
+}
+
 async function answer(request: Request): Promise<[Reply, ArrayBuffer[]]> {
   const { id } = request;
+  if (request.type === 'keep') {
+    keep(request.opened);
+    return [{ id, type: 'kept' }, []];
+  }
   if (request.type === 'dump') {
-    if (!recording) throw new ZulmError('nothing is open');
-    return [{ id, type: 'dumped', text: recording.dump(request.kinds) }, []];
+    const recording = recordings.get(request.opened);
+    if (!recording) throw new ZulmError('the recording has to be opened again');
+    return [{ id, type: 'dumped', text: recording.dump() }, []];
   }
   const { source, name, reports } = request;
-  recording?.close();
-  recording = undefined;
-  recording = await Recording.open(typeof source === 'string' ? bytesOf(source) : source, name);
+  const recording = await Recording.open(typeof source === 'string' ? bytesOf(source) : source, name);
+  recordings.set(id, recording);
   const { decoded, problems } = decode(recording, name, reports);
   return [{ id, type: 'opened', decoded, problems }, transferable(decoded)];
 }
