@@ -10,7 +10,7 @@ test=(libgtest-dev libgmock-dev imagemagick pngcheck libimage-exiftool-perl medi
 consumers=(clang make pkg-config binutils)
 python=(python3-dev python3-numpy python3-pybind11 pybind11-dev python3-pip python3-setuptools python3-wheel python3-pytest
     python3-matplotlib mypy)
-docs=(doxygen python3 python3-markdown)
+docs=(doxygen mkdocs python3-pygments)
 check=(clang clang-format git)
 lint=(clang clang-format clang-tidy cppcheck shellcheck codespell git python3)
 package=(dpkg-dev file mmdebstrap)

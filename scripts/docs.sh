@@ -1,0 +1,39 @@
+#!/usr/bin/env bash
+# Builds the documentation as a site in build/docs/html, and looks whether every link leads somewhere. Fails where a public
+# type is not described. Usage: scripts/docs.sh; BUILD names another folder than build/docs.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+build=${BUILD:-build/docs}
+
+scripts/install.sh docs
+
+echo "== the pages"
+rm -rf "$build"
+mkdir -p "$build/theme" "$build/html"
+python3 Docs/site/stage.py "$build/source"
+cp Docs/site/mkdocs.yml "$build/"
+cp Docs/site/main.html Docs/site/site.css "$build/theme/"
+/usr/bin/mkdocs --quiet build -f "$build/mkdocs.yml"
+
+echo "== the classes"
+api=$build/html/api
+mkdir -p "$api"
+headers=()
+for room in SharedDependencies ZULMetaData Platform ZULMetaDataBridge; do # those that are installed
+    mapfile -t names < <(sed -nE 's|^ +([A-Za-z0-9_/]+\.h)\)?$|\1|p' "$room/CMakeLists.txt")
+    headers+=("${names[@]/#/$room/}")
+done
+version=$(sed -nE 's/^project\(ZULMetaData VERSION ([0-9.]+).*/\1/p' CMakeLists.txt)
+ZULM_HEADERS="${headers[*]}" ZULM_VERSION=$version ZULM_API_FOLDER=$api ZULM_ROOT=$PWD \
+    doxygen Docs/site/Doxyfile 2>"$build/doxygen.txt"
+# A member's name and type often say all that there is to say.
+if grep -v ': Member .* is not documented\.$' "$build/doxygen.txt"; then
+    exit 1
+fi
+# Doxygen links to lists of classes that it leaves out since they are private.
+grep -lr 'href="#nested-classes"' "$api" | xargs grep -L 'name="nested-classes"' |
+    xargs -r sed -i '/<a href="#nested-classes">/d'
+
+echo "== the links"
+python3 Docs/site/check_links.py "$build/html"
+echo "Open $build/html/index.html"
