@@ -21,7 +21,6 @@ struct EncodedImageInfo {
 };
 
 /// Pixels of red, green, blue and straight alpha.
-/// Pixels of red, green, blue and straight alpha.
 class ZULMETADATA_API Image {
 public:
     /// `rgba` holds width * height pixels of four bytes (red, green, blue, straight alpha), rows from the top without
