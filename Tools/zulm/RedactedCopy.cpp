@@ -53,13 +53,26 @@ void writeBytes(std::ostream& output, const std::array<char, size>& bytes) {
     output.write(bytes.data(), static_cast<std::streamsize>(size));
 }
 
+[[noreturn]] void failToWrite(const std::string& name) {
+    throw Failure(fmt::format("{}: the copy cannot be written: {}", name, std::strerror(errno)));
+}
+
+/// How much has been written or skipped. A stream does not call itself failed where it cannot tell, and what is put
+/// behind that would stand in the wrong place. `name` is the input's.
+std::uint64_t sizeOf(std::ostream& output, const std::string& name) {
+    const auto end = output.tellp();
+    if (end < 0)
+        failToWrite(name);
+    return static_cast<std::uint64_t>(end);
+}
+
 /// The file ends where it was written or skipped to.
 void finish(std::ofstream& output, const std::string& path, const std::string& input) {
-    const auto end = output.tellp();
+    const std::uint64_t end = sizeOf(output, input);
     output.close();
-    if (!output || end < 0)
-        throw Failure(fmt::format("{}: the copy cannot be written: {}", input, std::strerror(errno)));
-    std::filesystem::resize_file(path, static_cast<std::uint64_t>(end));
+    if (!output)
+        failToWrite(input);
+    std::filesystem::resize_file(path, end);
 }
 
 std::uint64_t padded(std::uint64_t size) {
@@ -142,14 +155,14 @@ void RedactedCopy::write(const std::string& output) {
 void RedactedCopy::writeStreams(const std::string& file) {
     std::ofstream output = openOutput(file, recording_.name() + ": the copy");
     for (const HeldStream& held : heldStreams(recording_)) {
-        const auto begin = static_cast<std::uint64_t>(output.tellp());
+        const std::uint64_t begin = sizeOf(output, recording_.name());
         const StreamSource source = StreamSource::part(recording_.path(), held.offset, held.present);
         RedactedStream stream = redactStream(source.open(), redaction_, output);
         stream.bytesLeftOut += held.declared - held.present;
         stream.header.uuid = held.type;
         streams_.push_back(stream);
         if (stream.removal == RedactedStream::None)
-            parts_.push_back({begin, static_cast<std::uint64_t>(output.tellp()) - begin});
+            parts_.push_back({begin, sizeOf(output, recording_.name()) - begin});
     }
     finish(output, file, recording_.name());
 }
@@ -201,12 +214,12 @@ void RedactedCopy::writeItems(std::ostream& output) const {
         else if (isBeforeMedia(i))
             writeBlank(output, item);
         if (container() == MetaDataParser::Riff)
-            output.seekp(output.tellp() % 2, std::ios::cur);
+            output.seekp(static_cast<std::streamoff>(sizeOf(output, recording_.name()) % 2), std::ios::cur);
     }
 }
 
 void RedactedCopy::writeBlank(std::ostream& output, const ContainerItem& item) const {
-    const std::streamoff end = output.tellp() + static_cast<std::streamoff>(item.size);
+    const auto end = static_cast<std::streamoff>(sizeOf(output, recording_.name()) + item.size);
     if (container() == MetaDataParser::Riff)
         writeBytes(output, detail::chunkHeader(detail::s_junkChunk, static_cast<std::uint32_t>(item.payloadSize())));
     else if (item.size > s_most32)
