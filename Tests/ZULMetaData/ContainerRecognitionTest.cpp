@@ -36,7 +36,13 @@ TEST(ContainerRecognition, TakesTheSignatureForRIFF) {
 TEST(ContainerRecognition, TakesAnIdentifierOfTheFamilyForAStream) {
     EXPECT_EQ(streamTypeOfContents(streamHeader("2b7b6af2", 1, 16)), RawStream);
     EXPECT_EQ(streamTypeOfContents(streamHeader("2b7b6aff", 1, 16)), RawStream); // nobody's
-    EXPECT_EQ(streamTypeOfContents(hex("2b7b6af2 7a1f 11e2 83d0 0017f200be70") + std::string(8, '\0')), Unknown);
+}
+
+TEST(ContainerRecognition, KnowsTheFamilyByAllBehindTheFirstGroup) {
+    EXPECT_EQ(streamTypeOfContents(hex("00000000 7a1f 11e2 83d0 0017f200be7f")), RawStream);
+    EXPECT_EQ(streamTypeOfContents(hex("2b7b6af2 7b1f 11e2 83d0 0017f200be7f")), Unknown);
+    EXPECT_EQ(streamTypeOfContents(hex("2b7b6af2 7a1f 11e2 83d0 0017f200be70")), Unknown);
+    EXPECT_EQ(streamTypeOfContents(hex("2b7b6af2 7a1f 11e2 83d0 0017f200be")), Unknown); // cut short
 }
 
 TEST(ContainerRecognition, NamesTheExtensionThatTellsTheSame) {
