@@ -13,7 +13,7 @@ build=${BUILD:-build/check}
 rooms=(SharedDependencies ZULMetaData Platform ZULMetaDataBridge Bindings/JavaScript Tools/zulm Tools/demo)
 
 configure() {
-    cmake --preset clang -B "$build" -DCMAKE_VERIFY_INTERFACE_HEADER_SETS=ON >/dev/null
+    cmake --preset clang -B "$build" -DCMAKE_VERIFY_INTERFACE_HEADER_SETS=ON -DZULMETADATA_BUILD_PYTHON=AUTO >/dev/null
 }
 
 sources() {
@@ -46,7 +46,9 @@ check_cppcheck() { # which cannot parse lambdas with template parameters yet
 
 check_tidy() {
     configure
-    sources "${rooms[@]/%/\/}" | grep -vE 'WasmHost|(PNG|TIFF)Structure' | # which are of other builds
+    local compiled=("${rooms[@]}")
+    if grep -q Bindings/Python "$build/compile_commands.json"; then compiled+=(Bindings/Python); fi
+    sources "${compiled[@]/%/\/}" | grep -vE 'WasmHost|(PNG|TIFF)Structure' | # which are of other builds
         xargs -P "$(nproc)" -n 1 clang-tidy -p "$build" --quiet
 }
 

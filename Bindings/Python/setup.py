@@ -9,6 +9,7 @@ import re
 import subprocess
 import sys
 
+import pybind11
 from setuptools import Extension, setup
 from setuptools.command.build_ext import build_ext
 
@@ -23,7 +24,8 @@ class BuildByCMake(build_ext):
         build = BUILD / "cmake"
         subprocess.run(
             ["cmake", "-S", PROJECT, "-B", build, "-DCMAKE_BUILD_TYPE=Release", "-DBUILD_SHARED_LIBS=OFF",
-             "-DZULMETADATA_BUILD_PYTHON=ON", f"-DPython_EXECUTABLE={sys.executable}", "-DZULMETADATA_BUILD_TESTS=OFF",
+             "-DZULMETADATA_BUILD_PYTHON=ON", f"-DPython_EXECUTABLE={sys.executable}",
+             f"-Dpybind11_DIR={pybind11.get_cmake_dir()}", "-DZULMETADATA_BUILD_TESTS=OFF",
              "-DZULMETADATA_BUILD_TOOLS=OFF", "-DZULMETADATA_INSTALL=OFF"],
             check=True)
         subprocess.run(

@@ -4,6 +4,7 @@ A block is C++, shell or Python by the word behind its first fence. A block of t
 what it prints. C++ without a `main` is the body of a function of its own, behind includes of its own.
 
     blocks.py cpp PAGE OUTPUT    writes one source, which runs the block whose number it is given
+    blocks.py cmake PAGE PREFIX COMPILER    builds a program by each block of CMake, with what is installed in PREFIX
     blocks.py run PAGE PROGRAM ZULM PYTHONPATH VIEWER    runs every block in a folder of recordings of its own; without
         PYTHONPATH none of Python, and with VIEWER 0 no `zulm view`
 """
@@ -19,7 +20,7 @@ import tempfile
 FENCE = re.compile(r"^```(\w*)\n(.*?)^```$", re.MULTILINE | re.DOTALL)
 ROOT = pathlib.Path(__file__).resolve().parents[2]
 TESTED = ("cpp", "sh", "python")
-OTHERS = ("text", "cmake", "js")  # of which cmake and js have tests of their own
+OTHERS = ("text", "cmake", "js")
 # 1: a file could not be read; 2: wrong usage. The others tell what was found.
 FINE = (0, 3, 4)
 
@@ -67,6 +68,25 @@ def cpp_source(page):
         calls.append(f"    if (block == {block.line})\n        {name}();\n")
     return "\n".join([*dict.fromkeys(includes), "using namespace ZULMetaData;", "namespace {", *bodies, "}",
                       "int main(int, char** arguments) {", "    const int block = std::atoi(arguments[1]);", *calls, "}"])
+
+
+def build_by_cmake(page, prefix, compiler):
+    """The block links a program that uses the headers."""
+    built = 0
+    for found in re.finditer(r"^```cmake\n(.*?)^```$", page.read_text(encoding="utf-8"), re.MULTILINE | re.DOTALL):
+        (target,) = re.findall(r"target_link_libraries\((\w+)", found[1])
+        with tempfile.TemporaryDirectory() as folder:
+            folder = pathlib.Path(folder)
+            (folder / "main.cpp").write_text('#include "ZULMetaDataBridge/ZULMetaDataBridge.h"\n'
+                                             'int main() { return ZULMetaData::validateRecording("a.dat").isDamaged(); }\n')
+            (folder / "CMakeLists.txt").write_text(f"cmake_minimum_required(VERSION 3.25)\nproject({target} CXX)\n"
+                                                   f"add_executable({target} main.cpp)\n{found[1]}")
+            subprocess.run(["cmake", "-S", folder, "-B", folder / "build", f"-DCMAKE_PREFIX_PATH={prefix}",
+                            f"-DCMAKE_CXX_COMPILER={compiler}"], check=True, stdout=subprocess.DEVNULL)
+            subprocess.run(["cmake", "--build", folder / "build"], check=True, stdout=subprocess.DEVNULL)
+        built += 1
+    print(f"{built} built")
+    return 0 if built else 1
 
 
 def make_recordings(folder, zulm):
@@ -151,6 +171,8 @@ def main():
     command, page, *rest = sys.argv[1:]
     if command == "run":
         sys.exit(run(pathlib.Path(page), *rest))
+    if command == "cmake":
+        sys.exit(build_by_cmake(pathlib.Path(page), *rest))
     source = cpp_source(pathlib.Path(page))
     output = pathlib.Path(rest[0])
     if not output.exists() or output.read_text(encoding="utf-8") != source:
