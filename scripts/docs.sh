@@ -12,8 +12,9 @@ rm -rf "$build"
 mkdir -p "$build/theme" "$build/html"
 python3 Docs/site/stage.py "$build/source"
 cp Docs/site/mkdocs.yml "$build/"
-cp Docs/site/main.html Docs/site/site.css "$build/theme/"
+cp Docs/site/main.html Docs/site/site.css Docs/site/search.js "$build/theme/"
 /usr/bin/mkdocs --quiet build -f "$build/mkdocs.yml"
+python3 Docs/site/index_pages.py "$build/html"
 
 echo "== the classes"
 api=$build/html/api
