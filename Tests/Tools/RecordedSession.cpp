@@ -15,9 +15,8 @@ std::string tinyMovie(std::uint32_t duration, std::uint32_t timescale) {
 }
 
 std::string recordingInfo(const std::string& name, const std::string& version, const std::string& platformVersion) {
-    const auto field = [](std::string text, std::size_t size) {
-        text.resize(size);
-        return text;
+    const auto field = [](const std::string& text, std::size_t size) {
+        return std::string(size, '\0').replace(0, text.size(), text);
     };
     return extendedAtom("ZULR", le64(1) + field(name, 24) + field(version, 16) + field(platformVersion, 16));
 }
