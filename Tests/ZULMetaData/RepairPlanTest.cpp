@@ -135,7 +135,8 @@ TEST(RepairPlan, TakesInTheEightBytesThatARepairLeftOver) {
 TEST(RepairPlan, TakesThemInWhereSomethingWasAppendedBehindThem) {
     const std::string stamp = extendedAtom("ZULR", std::string(64, '\0'));
     for (const std::string& last : {hex("0000000000000000"), std::string("\0\0\0\x64moov", 8), std::string("textmdat")})
-        for (const std::string& behind : {zulmAtom({locationStream()}), stamp, stamp + zulmAtom({locationStream()})})
+        for (const std::string& behind :
+             {zulmAtom({locationStream()}), zulmAtom({}), stamp, stamp + zulmAtom({locationStream()})})
             expectOneChange(planForShortMovie(last, behind), 20, be64(s_4GiB), be64(s_4GiB + 8));
 }
 
@@ -146,6 +147,12 @@ TEST(RepairPlan, GoesOnToAnInterruptedAppendBehindThem) {
     EXPECT_EQ(plan.changes[0].after, be64(s_4GiB + 8));
     EXPECT_EQ(plan.changes[1].offset, 12 + s_4GiB + 8 + 8);
     EXPECT_EQ(plan.changes[1].after, be64(16 + 16 + 56));
+}
+
+TEST(RepairPlan, CannotMendAMovieWhoseAtomBehindThemReachesBeyondTheEnd) {
+    const std::string stamp = extendedAtom("ZULR", std::string(64, '\0'));
+    expectUnrepairable(planForShortMovie(hex("ffffffffffffffff"), stamp + be32(100) + "free"),
+                       12 + s_4GiB + 8 + stamp.size(), "but the file ends after 8");
 }
 
 TEST(RepairPlan, LeavesEightBytesThatAreAnAtom) {

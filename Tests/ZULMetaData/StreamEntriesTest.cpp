@@ -128,6 +128,10 @@ TEST(DecodeEntry, ReadsFixedValuesOfTheirExactSize) {
     EXPECT_FALSE(decodeEntry<Point>(pointEntry(0.5, 10, -20).substr(1), 1));
 }
 
+TEST(DecodeEntry, ReadsATextWithoutCharacters) {
+    EXPECT_EQ(decodeEntry<std::string>(textEntry(2.5, ""), 1)->value, "");
+}
+
 TEST(DecodeEntry, RefusesATextWhoseSizeDisagreesWithItsBytes) {
     const std::string entry = textEntry(2.5, "Notes");
     EXPECT_EQ(decodeEntry<std::string>(entry, 1)->value, "Notes");
