@@ -5,7 +5,8 @@ macro(zulm_macos_package method package)
 endmacro()
 cmake_language(SET_DEPENDENCY_PROVIDER zulm_macos_package SUPPORTED_METHODS FIND_PACKAGE)
 
-foreach(target IN ITEMS PNG::PNG TIFF::TIFF CLI11::CLI11 nlohmann_json::nlohmann_json fmt::fmt-header-only)
+foreach(target IN ITEMS PNG::PNG TIFF::TIFF CLI11::CLI11 nlohmann_json::nlohmann_json fmt::fmt-header-only
+                     Threads::Threads)
   add_library(${target} INTERFACE IMPORTED)
 endforeach()
 target_link_libraries(PNG::PNG INTERFACE ${ZULM_MACOS_DEPENDENCIES}/lib/libpng.tbd)
