@@ -11,13 +11,27 @@ namespace ZULMetaData {
 
 namespace {
 
-/// The libraries of the codecs get memory from the C library, and tell one that has none like a damaged picture.
+bool isNothing(const std::vector<std::uint8_t>& encoded) {
+    return encoded.empty();
+}
+
+template <class Decoded>
+bool isNothing(const std::optional<Decoded>& decoded) {
+    return !decoded;
+}
+
+/// The libraries of the codecs get memory from the C library, and tell one that has none like a damaged picture. The C
+/// library may set the number of that error where it found some elsewhere, but not twice for the same work.
 template <class Work>
 auto orOutOfMemory(Work work) {
     errno = 0;
     auto result = work();
-    if (errno == ENOMEM) {
-        throw std::bad_alloc();
+    if (isNothing(result) && errno == ENOMEM) {
+        errno = 0;
+        result = work();
+        if (isNothing(result) && errno == ENOMEM) {
+            throw std::bad_alloc();
+        }
     }
     return result;
 }

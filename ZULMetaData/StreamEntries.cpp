@@ -139,7 +139,7 @@ bool readEntryBytes(std::string_view bytes, double& time, CursorImage& image, in
         return false;
     errno = 0;
     reader.ReadMetaDataFields(input, schema, record);
-    if (errno == ENOMEM) // which a reader takes for an image that does not fit
+    if (!image.imageData && errno == ENOMEM) // which a reader takes for an image that does not fit
         throw std::bad_alloc();
     return true;
 }

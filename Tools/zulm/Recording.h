@@ -12,6 +12,7 @@
 #include <nlohmann/json.hpp>
 
 #include <cerrno>
+#include <concepts>
 #include <cstdint>
 #include <istream>
 #include <memory>
@@ -56,8 +57,10 @@ public:
     explicit WithTheirImages(ZULMetaData::DataStreamObserver<Value>& observer) : observer_(observer) { errno = 0; }
 
     bool dataRead(double time, const Value& value) override {
-        if (errno == ENOMEM)
-            throw std::bad_alloc();
+        if constexpr (std::same_as<Value, ZULMetaData::CursorImage>) {
+            if (!value.imageData && errno == ENOMEM)
+                throw std::bad_alloc();
+        }
         const bool goesOn = observer_.dataRead(time, value);
         errno = 0;
         return goesOn;
