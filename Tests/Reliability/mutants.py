@@ -15,8 +15,7 @@ CONDITION = re.compile(r"\b(if|while) \((?!const auto|auto|const std|char\*|cons
 STATEMENT = re.compile(r"^\s+(?!return|throw|using|case|default|const |auto |static|break|continue|else|for |if |while )"
                        r"(\w[\w.:\->\[\]*<>]*\(.*\)|\*?[\w.\->\[\]()]+ [-+|&]?= .*|(\+\+|--)\w+);$")
 IGNORED = re.compile(r"^\s*(#|//|///|template|static_assert|using|namespace|friend|\}|\{\"|class |struct |enum )|operator"
-                     r"|constexpr uuid|kindUUID\(0x|std::cout|std::cerr|reserve\("
-                     r"|^\s*[\w:]+ \w+ = 0;")  # initial values that are overwritten at once
+                     r"|constexpr uuid|kindUUID\(0x|std::cout|std::cerr|reserve\(")
 
 
 @dataclasses.dataclass(frozen=True)
