@@ -11,27 +11,19 @@ namespace ZULMetaData {
 
 namespace {
 
-bool isNothing(const std::vector<std::uint8_t>& encoded) {
-    return encoded.empty();
-}
-
-template <class Decoded>
-bool isNothing(const std::optional<Decoded>& decoded) {
-    return !decoded;
-}
-
-/// The libraries of the codecs get memory from the C library, and tell one that has none like a damaged picture. The C
-/// library may set the number of that error where it found some elsewhere, but not twice for the same work.
+/// The libraries of the codecs get memory from the C library. One that has none is told like a damaged picture, or
+/// leaves something out of what it writes. The C library may set the number of that error where it found memory
+/// elsewhere, but not twice for the same work.
 template <class Work>
 auto orOutOfMemory(Work work) {
     errno = 0;
     auto result = work();
-    if (isNothing(result) && errno == ENOMEM) {
+    if (errno == ENOMEM) {
         errno = 0;
         result = work();
-        if (isNothing(result) && errno == ENOMEM) {
-            throw std::bad_alloc();
-        }
+    }
+    if (errno == ENOMEM) {
+        throw std::bad_alloc();
     }
     return result;
 }

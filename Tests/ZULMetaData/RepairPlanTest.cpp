@@ -204,6 +204,8 @@ TEST(RepairPlan, KeepsEveryStreamOfAnInterruptedAppendThatIsWhole) {
     const std::string children = extendedAtom("DATA", locationStream()) + extendedAtom("DATA", appNameStream());
     expectOneChange(planFor(media() + interrupted("ZULM", children)), 30 + 8, be64(0), be64(16 + 72 + 72));
     expectOneChange(planFor(media() + interrupted("ZULM", "")), 30 + 8, be64(0), be64(16));
+    const std::string empty = extendedAtom("DATA", locationStream().substr(0, 24));
+    expectOneChange(planFor(media() + interrupted("ZULM", empty + children)), 30 + 8, be64(0), be64(16 + 40 + 72 + 72));
 }
 
 TEST(RepairPlan, SetsTheBytesOfATornEntryAside) {
