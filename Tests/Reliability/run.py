@@ -33,6 +33,8 @@ CHECKS = {
     "mutation": "mutants of the stream core killed by the tests",
 }
 FULL_ONLY = {"mutation"}
+MOST_SHOWN = 50  # failures of one check
+LONGEST = ["fuzzing", "mutation", "valgrind", "bit_flips"]  # started first
 
 
 def execute(name, arguments):
@@ -73,14 +75,15 @@ def main():
     names = arguments.only or [name for name in CHECKS if arguments.extent == "full" or name not in FULL_ONLY]
     outcomes = {}
     with concurrent.futures.ProcessPoolExecutor(max_workers=2) as pool:
-        for done in concurrent.futures.as_completed([pool.submit(execute, name, arguments) for name in names]):
+        order = [name for name in LONGEST if name in names] + [name for name in names if name not in LONGEST]
+        for done in concurrent.futures.as_completed([pool.submit(execute, name, arguments) for name in order]):
             name, result, seconds = done.result()
             outcomes[name] = (name, result, seconds)
             print(f"{name}: {'holds' if result.holds() else 'FAILS'} ({result.cases} cases, {seconds:.0f} s)",
                   file=sys.stderr, flush=True)
             for note in result.notes:
                 print(f"    {note}", file=sys.stderr)
-            for failure in result.failures[:20]:
+            for failure in result.failures[:MOST_SHOWN]:
                 print(f"    {failure}", file=sys.stderr)
 
     text = table([outcomes[name] for name in names])

@@ -81,7 +81,8 @@ TEST_F(ConvertCommand, MasksEveryKeyThatTypesACharacter) {
     std::getline(lines, entries);
     for (std::string line; std::getline(lines, line);) {
         const bool isText = line.find("-->") == std::string::npos;
-        EXPECT_TRUE(!isText || std::none_of(line.begin(), line.end(), [](char c) { return c > ' ' && c <= '~'; })) << line;
+        EXPECT_TRUE(!isText || std::none_of(line.begin(), line.end(), [](char c) { return c > ' ' && c <= '~'; }))
+            << line;
     }
 }
 
