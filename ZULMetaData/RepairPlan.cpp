@@ -90,7 +90,7 @@ private:
     static std::uint64_t sizeOf(std::istream& movie) {
         movie.clear();
         movie.seekg(0);
-        return static_cast<std::uint64_t>(ParserUtil::calcFileSize(movie));
+        return sizeOfInput(movie);
     }
 
     void walk();

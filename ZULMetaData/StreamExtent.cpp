@@ -70,4 +70,13 @@ void requireReadable(const std::istream& input) {
         throw std::system_error(EIO, std::generic_category(), "cannot be read");
 }
 
+std::uint64_t sizeOfInput(std::istream& input) {
+    input.clear();
+    const std::int64_t size = ParserUtil::calcFileSize(input);
+    if (size < 0)
+        input.setstate(std::ios_base::failbit);
+    requireReadable(input);
+    return static_cast<std::uint64_t>(size);
+}
+
 } // namespace ZULMetaData

@@ -48,4 +48,7 @@ ZULMETADATA_API ReadBytes readingFrom(std::istream& input);
 /// what is not there.
 ZULMETADATA_API void requireReadable(const std::istream& input);
 
+/// How many bytes `input` holds, whatever state it was in. Throws `std::system_error` where that cannot be told.
+ZULMETADATA_API std::uint64_t sizeOfInput(std::istream& input);
+
 } // namespace ZULMetaData

@@ -4,6 +4,7 @@
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/ZULMetaData/ContainerBytes.h"
+#include "ZULMetaData/RepairPlan.h"
 
 #include <gtest/gtest.h>
 
@@ -144,6 +145,23 @@ TEST(StreamExtent, FindsNothingBehindTheEndOfMemory) {
     EXPECT_EQ(read(4, bytes), 4U);
     EXPECT_EQ(read(8, bytes), 0U);
     EXPECT_EQ(read(9, bytes), 0U);
+}
+
+TEST(SizeOfInput, IsThatOfAllBytesWhateverTheState) {
+    std::istringstream input("12345678");
+    input.seekg(3);
+    input.setstate(std::ios_base::eofbit | std::ios_base::failbit);
+    EXPECT_EQ(sizeOfInput(input), 8U);
+    EXPECT_TRUE(input.good());
+}
+
+TEST(SizeOfInput, IsNoNumberWhereItCannotBeTold) {
+    struct WithoutEnd : std::stringbuf {
+        pos_type seekoff(off_type, std::ios_base::seekdir, std::ios_base::openmode) override { return off_type(-1); }
+    } device;
+    std::istream input(&device);
+    EXPECT_THROW(sizeOfInput(input), std::system_error);
+    EXPECT_THROW(planRepair(input), std::system_error);
 }
 
 TEST(StreamExtent, TakesAnInputThatEndsEarlyForTorn) {

@@ -103,7 +103,7 @@ void createFolder(const std::string& folder) {
     if (error)
         throw Failure(fmt::format("{}: cannot be created: {}", folder, error.message()));
     if (!std::filesystem::is_directory(folder, error))
-        throw Failure(fmt::format("{}: is no folder", folder));
+        throw Failure(error ? fmt::format("{}: {}", folder, error.message()) : fmt::format("{}: is no folder", folder));
 }
 
 std::string streamFileIn(const std::string& folder, const uuid& type, std::size_t number) {
@@ -127,8 +127,9 @@ void writePart(const std::string& input, std::uint64_t offset, std::uint64_t siz
     from.seekg(static_cast<std::streamoff>(offset));
     for (std::uint64_t left = size; left > 0; progress.moveTo(size - left)) {
         from.read(piece.data(), static_cast<std::streamsize>(std::min<std::uint64_t>(left, piece.size())));
+        requireRead(from, input);
         if (from.gcount() == 0)
-            throw Failure(fmt::format("{}: cannot be read at offset {}", input, offset + size - left));
+            throw Failure(fmt::format("{}: ends at offset {}", input, offset + size - left));
         to.write(piece.data(), from.gcount());
         left -= static_cast<std::uint64_t>(from.gcount());
     }

@@ -46,12 +46,7 @@ Recording::Recording(std::istream& input, MetaDataParser::StreamType type, std::
 }
 
 std::uint64_t Recording::size() {
-    std::istream& stream = parser_->getStream();
-    stream.clear();
-    const std::int64_t size = ParserUtil::calcFileSize(stream);
-    if (size < 0 || stream.fail())
-        throw Failure(fmt::format("{}: cannot be read", name_));
-    return static_cast<std::uint64_t>(size);
+    return orUnreadable(name_, [this] { return sizeOfInput(parser_->getStream()); });
 }
 
 ReadBytes Recording::bytes() {
@@ -118,8 +113,7 @@ std::vector<StreamInfo> Recording::hiddenStreams() {
 }
 
 void requireRead(const std::istream& stream, const std::string& name) {
-    if (stream.bad() || (stream.fail() && !stream.eof()))
-        throw Failure(fmt::format("{}: cannot be read", name));
+    orUnreadable(name, [&stream] { requireReadable(stream); });
 }
 
 std::string containerName(MetaDataParser::StreamType type) {

@@ -157,7 +157,8 @@ void RedactedCopy::writeStreams(const std::string& file) {
     for (const HeldStream& held : heldStreams(recording_)) {
         const std::uint64_t begin = sizeOf(output, recording_.name());
         const StreamSource source = StreamSource::part(recording_.path(), held.offset, held.present);
-        RedactedStream stream = redactStream(source.open(), redaction_, output);
+        RedactedStream stream =
+            orUnreadable(recording_.name(), [&] { return redactStream(source.open(), redaction_, output); });
         stream.bytesLeftOut += held.declared - held.present;
         stream.header.uuid = held.type;
         streams_.push_back(stream);

@@ -84,8 +84,7 @@ void writeMovie(std::ofstream& stream, const std::string& movie, const std::stri
         write(stream, base64({piece.data(), static_cast<std::size_t>(from.gcount())}));
         progress.advance(static_cast<std::uint64_t>(from.gcount()));
     }
-    if (from.bad())
-        throw Failure(fmt::format("{}: cannot be read", name));
+    requireRead(from, name);
 }
 
 void writePage(const ViewOptions& options, const InputFile& input, const PageParts& page, const Json& document) {

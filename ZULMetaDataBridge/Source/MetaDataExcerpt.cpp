@@ -4,22 +4,14 @@
 #include "ZULMetaData/StreamExtent.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <cstdint>
 #include <cstring>
 #include <span>
-#include <system_error>
 #include <vector>
 
 namespace ZULMetaData {
 
 namespace {
-
-/// What could not be read must not pass for what is not there.
-void requireRead(const std::istream& stream) {
-    if (stream.bad() || (stream.fail() && !stream.eof()))
-        throw std::system_error(EIO, std::generic_category(), "cannot be read");
-}
 
 /// As far as the file holds them.
 std::string bytesOf(const ReadBytes& read, std::uint64_t total, std::uint64_t begin, std::uint64_t end) {
@@ -42,14 +34,12 @@ std::string emptyRIFF(std::string start) {
 
 std::string metaDataExcerpt(MetaDataParser& recording) {
     std::istream& stream = recording.getStream();
-    stream.clear();
-    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
-    requireRead(stream);
+    const std::uint64_t total = sizeOfInput(stream);
     const ReadBytes read = readingFrom(stream);
     if (recording.getStreamType() == MetaDataParser::RawStream)
         return bytesOf(read, total, 0, total);
     const std::vector<ContainerItem> items = listTopLevel(stream, recording.getStreamType());
-    requireRead(stream);
+    requireReadable(stream);
     std::string excerpt;
     for (const ContainerItem& item : items) {
         if (item.type == "RIFF" && item.offset == 0)

@@ -1,6 +1,7 @@
 #include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 
 #include "SharedDependencies/EndianFile.h"
+#include "ZULMetaData/StreamExtent.h"
 #include "ZULMetaDataBridge/Source/Validation/ContainerWalk.h"
 #include "ZULMetaDataBridge/Source/Validation/FindingLog.h"
 #include "ZULMetaDataBridge/Source/Validation/UntrustedInput.h"
@@ -39,12 +40,9 @@ ValidationReport validateRecording(const FileLocation& file) {
 ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type) {
     stream.clear();
     stream.seekg(0);
-    const std::int64_t total = ParserUtil::calcFileSize(stream);
-    if (total < 0)
-        throw std::runtime_error("cannot be read");
     ValidationReport report;
     report.container = type;
-    report.bytes = static_cast<std::uint64_t>(total);
+    report.bytes = sizeOfInput(stream);
     detail::UntrustedInput input(stream, report.bytes);
     detail::ContainerWalk walk(input, report);
     switch (type) {

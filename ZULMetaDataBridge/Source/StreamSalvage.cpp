@@ -129,9 +129,7 @@ ReadBytes readingBehind(ReadBytes read, std::uint64_t offset) {
 
 StreamSalvage::StreamSalvage(std::istream& file, MetaDataParser::StreamType type, Progress progress)
     : read_(readingFrom(file)), file_(file), type_(type), progress_(std::move(progress)) {
-    file_.clear();
-    total_ = static_cast<std::uint64_t>(ParserUtil::calcFileSize(file_));
-    requireReadable(file_);
+    total_ = sizeOfInput(file_);
 }
 
 SalvageReport StreamSalvage::run() {

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <filesystem>
 #include <fstream>
 #include <limits>
 #include <memory>
@@ -18,11 +19,15 @@ StreamSource::Bytes openPart(const FileLocation& location, std::uint64_t offset,
     auto file = std::make_shared<std::ifstream>();
     errno = 0;
     fileOpen(*file, utf8Path(location).c_str(), std::ios_base::binary);
-    const int reason = errno;
-    std::error_code ignored;
-    if (!std::filesystem::is_regular_file(location, ignored) || !file->is_open())
-        throw std::system_error(reason != 0 ? reason : EINVAL, std::generic_category(), "cannot be opened");
-    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(*file));
+    std::error_code reason(errno, std::generic_category());
+    std::error_code looking;
+    const bool isFile = std::filesystem::is_regular_file(location, looking);
+    if (!isFile || !file->is_open()) {
+        if (!reason)
+            reason = looking ? looking : std::make_error_code(std::errc::invalid_argument);
+        throw std::system_error(reason, "cannot be opened");
+    }
+    const std::uint64_t total = sizeOfInput(*file);
     const std::uint64_t begin = std::min(offset, total);
     return {std::min(length, total - begin), [file, begin](std::uint64_t position, std::span<char> bytes) {
                 return readingFrom(*file)(begin + position, bytes);

@@ -7,8 +7,8 @@
 #include <cstddef>
 #include <cstdint>
 #include <istream>
-#include <stdexcept>
 #include <string>
+#include <system_error>
 
 namespace ZULMetaData::detail {
 
@@ -43,7 +43,8 @@ public:
 private:
     void require(bool came) const {
         if (!came)
-            throw std::runtime_error("cannot be read at offset " + std::to_string(position()));
+            throw std::system_error(std::make_error_code(std::errc::io_error),
+                                    "cannot be read at offset " + std::to_string(position()));
     }
 
     PositionedInput input_;
