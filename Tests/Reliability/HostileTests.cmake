@@ -21,7 +21,7 @@ function(zulm_add_hostile_program name)
   add_executable(${name} EXCLUDE_FROM_ALL
     Reliability/Programs/${name}.cpp Reliability/Programs/Exercise.cpp Reliability/Programs/Watch.cpp)
   target_link_libraries(${name} PRIVATE sanitized_bridge)
-  target_link_options(${name} PRIVATE LINKER:--wrap=malloc,--wrap=free)
+  target_link_options(${name} PRIVATE LINKER:--wrap=malloc,--wrap=calloc,--wrap=free)
   zulm_project_options(${name})
   set_target_properties(${name} PROPERTIES RUNTIME_OUTPUT_DIRECTORY ${CMAKE_CURRENT_BINARY_DIR}/Reliability)
   add_dependencies(reliability_programs ${name})

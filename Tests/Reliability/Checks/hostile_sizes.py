@@ -10,7 +10,7 @@ import recordings
 NUMBERS = [0, 1, 2, 3, 4, 5, 6, 7, 8, 15, 16, 17, 23, 24, 2**31 - 1, 2**31, 2**31 + 1, 2**32 - 1, 2**32, 2**32 + 1,
            2**62, 2**63 - 1, 2**63, 2**64 - 1]
 SECONDS = 1     # of the processor: others may keep it busy
-SAMPLE = 6      # in the short form the tool is run on every so manieth file, and on all crowds
+SAMPLE = 6      # in the short form the tool is run on every 6th file, and on all crowds
 MANY = 1 << 20  # bytes of a file of nothing but small items
 COMMANDS = (["verify"], ["atoms"], ["info"], ["salvage", "--force", "-o"], ["repair", "--dry-run"])
 
@@ -60,13 +60,18 @@ def riff_fields(contents):
 def stream_fields(kind, stream):
     """Entry sizes in the header and in front of the entries, and what stands inside the first of them."""
     fields = {"entries": (20, "<I")}
-    begin = recordings.HEADER
+    begin, *later = recordings.entry_ends(stream)
     if struct.unpack_from("<I", stream, 20)[0] == 0:
         fields["entry"] = (begin, "<I")
+        if later[1:]:
+            fields["second"] = (later[0], "<I")
     if kind == "systemData":
-        fields |= {"count": (begin + 4, "<I"), "text": (begin + 8, "<I")}
+        (first,) = struct.unpack_from("<I", stream, begin + 8)
+        fields |= {"count": (begin + 4, "<I"), "text": (begin + 8, "<I"), "text2": (begin + 12 + first, "<I")}
     if kind == "cursorImage":
-        fields |= {"data": (begin + 20, "<I"), "image": (begin + 32, "<I")}
+        data, image = struct.unpack_from("<II", stream, begin + 20)
+        assert data == image + 20, "the first entry has an image"
+        fields |= {"data": (begin + 20, "<I"), "image": (begin + 24, "<I")}
     return fields
 
 

@@ -4,6 +4,7 @@ import json
 import os
 import random
 import select
+import signal
 import struct
 import subprocess
 import time
@@ -13,16 +14,18 @@ from check import run as run_program
 from faults import OPEN_MOVIE
 from recordings import HEADER, entry_ends, fast_folder
 
-LONGEST = 0.06  # seconds from the first flush on
+LONGEST = 0.06  # seconds from the first flush on; in every 10th run from the start on
 
 
-def record_and_kill(context, folder, mode, seconds):
-    """Gives how many entries of each stream had been flushed, as the recorder said."""
+def record_and_kill(context, folder, mode, seconds, waits):
+    """How the recorder ended, and how many entries of each stream had been flushed, as it said. It is killed so many
+    seconds behind its first flush, or behind its start."""
     reader, writer = os.pipe()
     recorder = subprocess.Popen([context.program("recorder"), "record", folder, str(writer), mode], pass_fds=[writer])
     os.close(writer)
     told = bytearray()
-    select.select([reader], [], [], 30)
+    if waits:
+        select.select([reader], [], [], 30)
     end = time.monotonic() + seconds
     while (left := end - time.monotonic()) > 0:
         if select.select([reader], [], [], left)[0]:
@@ -31,11 +34,11 @@ def record_and_kill(context, folder, mode, seconds):
     while piece := os.read(reader, 1 << 16):
         told += piece
     os.close(reader)
-    recorder.wait()
+    ended = recorder.wait()
     flushed = {}
     for stream, entries in struct.iter_unpack("<II", told[: len(told) // 8 * 8]):
         flushed[stream] = entries
-    return flushed
+    return ended, flushed
 
 
 def right_entries(context, path):
@@ -105,7 +108,12 @@ def check_run(context, number, folder, flushed, result):
 def run_once(context, number, chance, result):
     with fast_folder() as name:
         folder = type(context.folder)(name)
-        flushed = record_and_kill(context, folder, chance.choice(("flushed", "buffered")), chance.uniform(0, LONGEST))
+        waits = number % 10 != 0
+        ended, flushed = record_and_kill(context, folder, chance.choice(("flushed", "buffered")),
+                                         chance.uniform(0, LONGEST), waits)
+        if ended != -signal.SIGKILL or (waits and not flushed):
+            result.crashed += 1
+            result.failures.append(f"run {number}: the recorder ended with {ended}, {len(flushed)} streams flushed")
         return check_run(context, number, folder, flushed, result)
 
 

@@ -8,7 +8,7 @@ import recordings
 
 SMALL = 6 * 1024   # bytes of metadata at most
 LARGE = 64 * 1024
-SAMPLE = 97        # in the short form the tool is run on every so manieth length
+SAMPLE = 97        # in the short form the tool is run on every 97th length
 OPEN_MEDIA = struct.pack(">I", 0) + b"mdat" + recordings.MEDIA
 
 
@@ -68,7 +68,7 @@ def ends_of(name, contents):
 
 
 def verify(context, name, contents, result):
-    """Many lengths in one process: the report has a verdict for each."""
+    """What `zulm verify` ends with for the file cut after some lengths, or after each."""
     expected = ends_of(name, contents)
     lengths = range(0, len(contents) + 1, 1 if context.full and len(contents) < LARGE // 2 else SAMPLE)
     for length in sorted({*lengths, *(end for end in expected)}):

@@ -10,6 +10,7 @@
 #include <map>
 #include <new>
 #include <sstream>
+#include <string_view>
 
 namespace Reliability {
 
@@ -26,6 +27,10 @@ constexpr double s_secondsAtMost = 1;
 template <class Value>
 constexpr bool isBelieved =
     std::same_as<Value, std::string> || std::same_as<Value, std::list<std::string>> || std::same_as<Value, CursorImage>;
+
+std::string_view identifierOf(const uuid& type) {
+    return {reinterpret_cast<const char*>(type.data), sizeof type.data};
+}
 
 template <class Value>
 struct Counter final : DataStreamObserver<Value> {
@@ -103,7 +108,9 @@ void Exercise::salvage() {
 void Exercise::readAsFile() {
     std::uint64_t index = 0;
     RecordedKinds::forEach([&]<class Kind>() {
-        if (parsers_ == InTurn && index++ != cases_ % RecordedKinds::size)
+        const bool isItsTurn = parsers_ == EachTime || index++ == cases_ % RecordedKinds::size;
+        const bool isItsStream = type_ == MetaDataParser::RawStream && bytes_.starts_with(identifierOf(Kind::type));
+        if (!isItsTurn && !isItsStream)
             return;
         const auto read = [&] { KindMetaDataParser<Kind>(path_).read(); };
         if constexpr (isBelieved<typename Kind::Value>)

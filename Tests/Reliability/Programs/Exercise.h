@@ -18,7 +18,8 @@ public:
 
 class Exercise {
 public:
-    /// The parsers that open a file: all of them read each case, or each case is read by the next of them.
+    /// The parsers that open a file: all of them read each case, or each case is read by the next of them, and a bare
+    /// stream by its own.
     enum FileParsers { EachTime, InTurn };
 
     /// `folder` is for the files of the cases; `extension` tells the container.

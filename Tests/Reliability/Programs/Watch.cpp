@@ -16,6 +16,7 @@ extern "C" {
 void* __real_malloc(std::size_t size);
 void __real_free(void* block);
 void* __wrap_malloc(std::size_t size);
+void* __wrap_calloc(std::size_t count, std::size_t size);
 void __wrap_free(void* block);
 void __sanitizer_set_death_callback(void (*callback)()) __attribute__((weak));
 void __sanitizer_set_report_fd(void* file) __attribute__((weak));
@@ -123,6 +124,12 @@ void tell(const std::string& line) {
 
 void* __wrap_malloc(std::size_t size) {
     return Reliability::allocate(size);
+}
+
+void* __wrap_calloc(std::size_t count, std::size_t size) {
+    std::size_t bytes = 0;
+    void* block = __builtin_mul_overflow(count, size, &bytes) ? nullptr : Reliability::allocate(bytes);
+    return block ? std::memset(block, 0, bytes) : nullptr;
 }
 
 void __wrap_free(void* block) {

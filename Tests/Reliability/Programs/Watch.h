@@ -9,7 +9,7 @@
 namespace Reliability {
 
 /// From now on memory is refused that would make this program hold more than `bytes` above what it holds now. Counted
-/// is what the program and the library ask for, by `new` and `malloc`.
+/// is what the program and the library ask for, by `new`, `malloc` and `calloc`; not what libpng and libtiff do.
 void limitMemory(std::size_t bytes);
 void liftMemoryLimit();
 

@@ -77,6 +77,7 @@ int main(int argc, char** argv) {
     silence();
     const auto number = [&](int i) { return std::strtoull(argv[i], nullptr, 10); };
     constexpr int firstFile = 5;
+    const auto files = static_cast<std::uint64_t>(argc - firstFile);
     const std::uint64_t part = number(2);
     const std::uint64_t randomCases = number(4);
     std::mt19937_64 random(part);
@@ -85,7 +86,7 @@ int main(int argc, char** argv) {
     for (int i = firstFile; i < argc; ++i) {
         Flipper flipper(argv[1], argv[i]);
         flipper.flipEach(part, number(3));
-        flipper.flipAtRandom(randomCases / static_cast<std::uint64_t>(argc - firstFile), random);
+        flipper.flipAtRandom((randomCases + files - 1) / files, random);
         cases += flipper.cases();
         demanding += flipper.demanding();
     }
