@@ -17,7 +17,8 @@ namespace {
 /// One list of items and the bytes that they should fill.
 class Walk {
 public:
-    Walk(MetaDataParser& parser, LayoutPart part, Layout& layout) : parser_(parser), part_(part), layout_(layout) {}
+    Walk(Recording& recording, LayoutPart part, Layout& layout)
+        : name_(recording.name()), parser_(recording.parser()), part_(part), layout_(layout) {}
 
     std::vector<LayoutItem> items(std::uint64_t begin, std::uint64_t end, bool isInsideMetaData) {
         const std::uint64_t firstEnd = layout_.ends.size();
@@ -53,6 +54,7 @@ private:
 
     void visit(std::uint64_t begin, std::uint64_t end, const ContainerVisitor& visitor) {
         (isMovie() ? visitAtoms : visitChunks)(parser_.getStream(), begin, end, layout_.fileSize, visitor);
+        requireRead(parser_.getStream(), name_);
     }
 
     LayoutItem entryFor(const ContainerItem& found, bool isInsideMetaData) {
@@ -70,7 +72,9 @@ private:
         std::istream& stream = parser_.getStream();
         stream.clear();
         stream.seekg(static_cast<std::streamoff>(offset));
-        if (!stream.read(reinterpret_cast<char*>(&header), sizeof header))
+        const bool isThere = !stream.read(reinterpret_cast<char*>(&header), sizeof header).fail();
+        requireRead(stream, name_);
+        if (!isThere)
             return std::nullopt;
         return header.uuid;
     }
@@ -101,6 +105,7 @@ private:
         return {};
     }
 
+    const std::string& name_;
     MetaDataParser& parser_;
     LayoutPart part_;
     Layout& layout_;
@@ -115,11 +120,10 @@ std::string LayoutItem::headerForm() const {
 }
 
 Layout layoutOf(Recording& recording, LayoutPart part) {
-    MetaDataParser& parser = recording.parser();
     Layout layout;
     layout.fileSize = recording.size();
-    if (parser.getStreamType() != MetaDataParser::RawStream)
-        layout.items = Walk(parser, part, layout).items(0, layout.fileSize, false);
+    if (recording.parser().getStreamType() != MetaDataParser::RawStream)
+        layout.items = Walk(recording, part, layout).items(0, layout.fileSize, false);
     return layout;
 }
 

@@ -40,7 +40,10 @@ def cases(streams):
     stamp = ["stamp", "Movie.mp4", "--creator", "Recorder", "--creator-version", "1.0"]
     return [
         Case("info", ["info", "Recording.mp4"], whole),
+        Case("atoms", ["atoms", "Recording.mp4"], whole),
         Case("dump", ["dump", "Recording.mp4"], whole),
+        Case("grep", ["grep", "e", "Recording.mp4"], whole),
+        Case("diff", ["diff", "Recording.mp4", "Broken.mp4"], whole | damaged),
         Case("verify", ["verify", "Recording.mp4"], whole),
         Case("extract", ["extract", "Recording.mp4", "-o", "out"], whole),
         Case("attach a copy", ["attach", "Movie.mp4", *files, "-o", "Out.mp4"], movie | files),

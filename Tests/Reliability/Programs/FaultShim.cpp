@@ -342,6 +342,10 @@ CHANGE_NAMES(symlink)
 REMOVE(unlink)
 REMOVE(remove)
 
+int fchmod(int file, mode_t mode) noexcept {
+    return attempt(Operation::Change, -1, [=] { return NEXT(fchmod)(file, mode); });
+}
+
 int close(int file) {
     return attemptToClose(-1, [=] { return NEXT(close)(file); });
 }
