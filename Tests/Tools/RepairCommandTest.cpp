@@ -82,7 +82,7 @@ TEST_F(RepairCommand, MakesAMovieOfFiveGiBFillItsFile) {
     EXPECT_EQ(runTool({"repair", movie, "--dry-run"}).exitCode, 0);
 }
 
-TEST_F(RepairCommand, TakesInWhatTheDescribedRepairLeftOver) {
+TEST_F(RepairCommand, TakesInWhatThePlainRepairLeftOver) {
     constexpr std::uint64_t size = 0x100000000;
     writeSparseFile(movie, 20 + size, atom("ftyp", "mp42") + atom("wide") + be32(0) + "mdat");
     ASSERT_TRUE(Util::finalizeAtomsInFile(movie));

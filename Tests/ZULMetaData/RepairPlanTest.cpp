@@ -223,7 +223,7 @@ TEST(RepairPlan, CutsOffTornBytesThatAreTooFewForAnAtom) {
 }
 
 TEST(RepairPlan, ChangesNothingButOneSizeWhereStreamsCannotBeFollowed) {
-    // The first stream's size counts a torn tail that is not there, as the described append writes it.
+    // The first stream's size counts a torn tail that is not there, as the plain append writes it.
     for (const std::uint64_t size : {72U + 5, 72U + 500}) {
         const std::string children =
             be32(1) + "DATA" + be64(size) + appNameStream() + extendedAtom("DATA", locationStream());

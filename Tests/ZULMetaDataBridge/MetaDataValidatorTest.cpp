@@ -9,6 +9,7 @@
 #include "Tests/ZULMetaDataBridge/KindSamples.h"
 
 #include <limits>
+#include <new>
 #include <set>
 #include <sstream>
 #include <stdexcept>
@@ -423,6 +424,31 @@ TEST(MetaDataValidator, AsksForNoMoreMemoryThanTwiceTheFileAnd16MiB) {
         validateRecording(stream, type);
         EXPECT_LE(memory.peak(), 2 * bytes.size() + (std::size_t{16} << 20)) << bytes.size();
     }
+}
+
+// ---- sizes that readers believe ----
+
+/// 37 bytes, of which a text says that it goes on for a gigabyte.
+std::istringstream greedyStream() {
+    return std::istringstream(streamHeader(s_appNames, 1, 0) + le32(1U << 30) + f64(1) + "a");
+}
+
+TEST(BelievedSize, MakesAReaderOfAFewBytesAskForAllTheMemoryThatItSays) {
+    std::istringstream stream = greedyStream();
+    struct : DataStreamObserver<std::string> {
+        bool dataRead(double, const std::string&) override { return true; }
+    } observer;
+    MemoryWatch memory;
+    memory.refuseAbove(std::size_t{16} << 20);
+    EXPECT_THROW(MetaDataReader<std::string>::parseStream(observer, stream, 0, 37, -1), std::bad_alloc);
+    EXPECT_GE(memory.largestRequest(), (std::size_t{1} << 30) - 8);
+}
+
+TEST(BelievedSize, IsFoundByValidationInAlmostNoMemory) {
+    std::istringstream stream = greedyStream();
+    MemoryWatch memory;
+    memory.refuseAbove(std::size_t{1} << 20);
+    EXPECT_TRUE(validateRecording(stream, s_raw).isDamaged());
 }
 
 // ---- what cannot be read ----

@@ -1,4 +1,4 @@
-// Attaching and stamping without loss: what the described operations lose, and what the safe ones keep.
+// Attaching and stamping without loss: what the plain operations lose, and what the safe ones keep.
 
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
@@ -83,14 +83,14 @@ protected:
 
 // Attaching -------------------------------------------------------------------------------------------------------
 
-TEST_F(SafeSave, WritesWhatTheDescribedAppendWritesWhereNothingIsTorn) {
+TEST_F(SafeSave, WritesWhatThePlainAppendWritesWhereNothingIsTorn) {
     const std::vector<std::string> files{stream("a.dat", locationStream()), stream("b.dat", appNameStream())};
-    const std::string described = folder / "Described.mp4";
+    const std::string plain = folder / "Plain.mp4";
     writeFile(movie, openEndedMedia());
-    writeFile(described, openEndedMedia());
-    ZULMAtomWriter().writeMetaDataFiles({files.begin(), files.end()}, described);
+    writeFile(plain, openEndedMedia());
+    ZULMAtomWriter().writeMetaDataFiles({files.begin(), files.end()}, plain);
     SafeMovieSave(movie).attach(sources(files));
-    EXPECT_EQ(contentsOf(movie), contentsOf(described));
+    EXPECT_EQ(contentsOf(movie), contentsOf(plain));
     EXPECT_EQ(contentsOf(movie), media() + zulmAtom({locationStream(), appNameStream()}));
 }
 
@@ -275,7 +275,7 @@ protected:
     }
 };
 
-TEST_P(TornTail, HidesEveryStreamBehindItWhereTheDescribedAppendWritesIt) {
+TEST_P(TornTail, HidesEveryStreamBehindItWhereThePlainAppendWritesIt) {
     writeFile(movie, media());
     const auto list = files();
     MP4MetaData::appendMetaDataFiles(movie, list);
@@ -310,7 +310,7 @@ protected:
     std::string lastBytes() const { return bytesAt(20 + GetParam() - 8, 8); }
 };
 
-TEST_P(LargeMovie, HidesItsMetaDataAfterTheDescribedRepairAndIsWrittenIntoByASecondOne) {
+TEST_P(LargeMovie, HidesItsMetaDataAfterThePlainRepairAndIsWrittenIntoByASecondOne) {
     const std::string file = stream("a.dat", locationStream());
     ZULMAtomWriter().writeMetaDataFiles({file}, movie);
     EXPECT_EQ(streamCount(), 0U);
@@ -325,12 +325,12 @@ TEST_P(LargeMovie, ShowsItsMetaDataAfterTheSafeAttachAndIsWholeFromThenOn) {
     EXPECT_EQ(bytesAt(0, 28), atom("ftyp", "mp42") + be32(1) + "mdat" + be64(GetParam() + 8));
     SafeMovieSave(movie).stamp("Recorder", "4.2");
     EXPECT_EQ(SafeMovieSave(movie).repair().state, RepairPlan::Whole);
-    EXPECT_TRUE(ZULMAtomRepair::finalizeAtomsInFile(movie)) << "the described repair agrees";
+    EXPECT_TRUE(ZULMAtomRepair::finalizeAtomsInFile(movie)) << "the plain repair agrees";
     EXPECT_EQ(lastBytes(), be64(0));
     EXPECT_EQ(streamCount(), 1U);
 }
 
-TEST_P(LargeMovie, GetsMetaDataBackThatTheDescribedRepairHid) {
+TEST_P(LargeMovie, GetsMetaDataBackThatThePlainRepairHid) {
     const std::string file = stream("a.dat", locationStream());
     ZULMAtomWriter().writeMetaDataFiles({file}, movie);
     ASSERT_EQ(streamCount(), 0U);
@@ -362,12 +362,12 @@ TEST_F(SafeSave, RefusesToAppendBehindFourGiBThatCannotBeSized) {
     }
     EXPECT_EQ(std::filesystem::file_size(movie), 12 + s_4GiB);
     ZULMAtomWriter().writeMetaDataFiles({folder / "a.dat"}, movie);
-    EXPECT_EQ(streamCount(), 0U) << "the described append writes it all the same";
+    EXPECT_EQ(streamCount(), 0U) << "the plain append writes it all the same";
 }
 
 // Trap: an append that fails or is interrupted --------------------------------------------------------------------
 
-TEST_F(SafeSave, IsNotWhatItWasAfterADescribedAppendThatFails) {
+TEST_F(SafeSave, IsNotWhatItWasAfterAPlainAppendThatFails) {
     writeFile(movie, openEndedMedia());
     const std::string file = stream("a.dat", locationStream());
     {
@@ -563,13 +563,13 @@ TEST_F(SafeSave, KeepsASizeThatIsNotThereAwayFromReaders) {
 
 // Stamping and repairing ------------------------------------------------------------------------------------------
 
-TEST_F(SafeSave, StampsAsTheDescribedWriterDoes) {
-    const std::string described = folder / "Described.mp4";
+TEST_F(SafeSave, StampsAsThePlainWriterDoes) {
+    const std::string plain = folder / "Plain.mp4";
     writeFile(movie, openEndedMedia());
-    writeFile(described, openEndedMedia());
-    ZULRAtomWriter().writeZULRtoFile(described, "Recorder", "4.2");
+    writeFile(plain, openEndedMedia());
+    ZULRAtomWriter().writeZULRtoFile(plain, "Recorder", "4.2");
     const StampResult result = SafeMovieSave(movie).stamp("Recorder", "4.2");
-    EXPECT_EQ(contentsOf(movie), contentsOf(described));
+    EXPECT_EQ(contentsOf(movie), contentsOf(plain));
     EXPECT_EQ(result.info.creator.name(), CreatorAttributes::platformNameMac());
     EXPECT_EQ(result.info.creator.version(), "4.2");
     EXPECT_EQ(result.repair.changes.size(), 1U);
