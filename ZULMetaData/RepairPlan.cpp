@@ -3,13 +3,10 @@
 #include "ZULMetaData/AtomFormat.h"
 #include "ZULMetaData/PositionedInput.h"
 #include "ZULMetaData/StreamExtent.h"
-#include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <optional>
 #include <span>
-#include <system_error>
 #include <utility>
 
 namespace ZULMetaData {
@@ -335,8 +332,7 @@ void Planner::setAside(std::uint64_t begin) {
 
 RepairPlan planRepair(std::istream& movie) {
     RepairPlan plan = Planner(movie).plan();
-    if (movie.bad() || (movie.fail() && !movie.eof())) // what could not be read must not pass for what is not there
-        throw std::system_error(EIO, std::generic_category(), "cannot be read");
+    requireReadable(movie);
     return plan;
 }
 

@@ -18,8 +18,8 @@ echo "== trying the packages in a fresh Debian"
 printed=$build/packages/printed.txt
 # shellcheck disable=SC2016 # mmdebstrap knows the folder
 mmdebstrap --quiet --variant=apt --include=g++ \
-    --customize-hook="copy-in $build/packages README.md packaging/debian/try.sh /root" \
-    --customize-hook='chroot "$1" sh /root/try.sh' \
-    --customize-hook="download /root/printed.txt $printed" \
+    --customize-hook="copy-in $build/packages README.md packaging/debian/try.sh /srv" \
+    --customize-hook='chroot "$1" sh /srv/try.sh' \
+    --customize-hook="download /srv/printed.txt $printed" \
     bookworm /dev/null
 cat "$printed"

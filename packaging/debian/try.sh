@@ -1,7 +1,7 @@
 #!/bin/sh
-# Runs inside a Debian that has g++ and in /root the packages: see scripts/package.sh.
+# Runs inside a Debian that has g++ and in /srv the packages: see scripts/package.sh.
 set -eu
-cd /root
+cd /srv
 apt-get install -y -qq --no-install-recommends ./packages/*.deb >/dev/null
 
 awk '/^```/ { inside = !inside && $0 == "```cpp"; next } inside' README.md >example.cpp
