@@ -50,24 +50,21 @@ auto orUnreadable(const std::string& name, Work work) {
     }
 }
 
-/// Hands entries on. A reader leaves an image out that it gets no memory for; this throws `std::bad_alloc`.
-template <class Value>
-class WithTheirImages final : public ZULMetaData::DataStreamObserver<Value> {
+/// Hands cursor images on. A reader leaves an image out that it gets no memory for; this throws `std::bad_alloc`.
+class WithTheirImages final : public ZULMetaData::DataStreamObserver<ZULMetaData::CursorImage> {
 public:
-    explicit WithTheirImages(ZULMetaData::DataStreamObserver<Value>& observer) : observer_(observer) { errno = 0; }
+    explicit WithTheirImages(DataStreamObserver& observer) : observer_(observer) { errno = 0; }
 
-    bool dataRead(double time, const Value& value) override {
-        if constexpr (std::same_as<Value, ZULMetaData::CursorImage>) {
-            if (!value.imageData && errno == ENOMEM)
-                throw std::bad_alloc();
-        }
-        const bool goesOn = observer_.dataRead(time, value);
+    bool dataRead(double time, const ZULMetaData::CursorImage& image) override {
+        if (!image.imageData && errno == ENOMEM)
+            throw std::bad_alloc();
+        const bool goesOn = observer_.dataRead(time, image);
         errno = 0;
         return goesOn;
     }
 
 private:
-    ZULMetaData::DataStreamObserver<Value>& observer_;
+    DataStreamObserver& observer_;
 };
 
 class Recording {
@@ -106,9 +103,16 @@ public:
     /// Delivers the entries of a decodable stream as far as they are whole.
     template <class Value>
     void readEntries(const StreamInfo& stream, ZULMetaData::DataStreamObserver<Value>& observer) {
-        WithTheirImages<Value> whole(observer);
-        ZULMetaData::MetaDataReader<Value>::parseStream(whole, parser_->getStream(), stream.range.offset,
-                                                        stream.readableBytes, -1);
+        const auto readTo = [&](ZULMetaData::DataStreamObserver<Value>& to) {
+            ZULMetaData::MetaDataReader<Value>::parseStream(to, parser_->getStream(), stream.range.offset,
+                                                            stream.readableBytes, -1);
+        };
+        if constexpr (std::same_as<Value, ZULMetaData::CursorImage>) {
+            WithTheirImages whole(observer);
+            readTo(whole);
+        } else {
+            readTo(observer);
+        }
         requireRead(parser_->getStream(), name_);
     }
 
