@@ -48,6 +48,9 @@ const std::vector<Words> s_commands{
     {"convert", "--to", "chapters", "FILE"},
     {"view", "FILE", "-o", "DIR/out.html", "--force", "--page", "PAGE"},
     {"view", "FILE", "-o", "DIR/out.html", "--force", "--page", "PAGE", "--embed"},
+    {"repair", "FILE", "--in-place"},
+    {"attach", "FILE", "--from", "MOVIE", "--in-place", "--replace"},
+    {"stamp", "FILE", "--in-place", "--creator", "c", "--creator-version", "1"},
 };
 
 std::string replaced(std::string word, const std::string& name, const std::string& value) {

@@ -26,7 +26,7 @@ READERS = {
     "string": ["slideTitles", "topmostAppName"],
     "string_list": ["systemData"],
 }
-COMMANDS = 30
+COMMANDS = 33
 STREAM_BYTES = 200
 IDENTIFIERS = ["2b7b6af1-7a1f-11e2-83d0-0017f200be7f", "00000000-0000-0000-0000-000000000000", "2B7B-", "zz", ""]
 

@@ -46,6 +46,13 @@ def shortened(stream, most):
     return stream[: max(fitting[-1] if fitting else 0, ends[min(1, len(ends) - 1)])]
 
 
+def lengthened(stream, most):
+    """Its entries again and again, as many as fit into `most` bytes."""
+    ends = entry_ends(stream)
+    again = stream[HEADER:ends[-1]] * (most // max(1, ends[-1] - HEADER) + 1)
+    return shortened(stream[:HEADER] + again, most)
+
+
 def shortened_all(streams, most):
     """Shortened so that together they fit into `most` bytes, if one entry of each does."""
     share = most

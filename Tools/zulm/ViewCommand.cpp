@@ -87,8 +87,8 @@ void writeMovie(std::ofstream& stream, const std::string& movie, const std::stri
     requireRead(from, name);
 }
 
-void writePage(const ViewOptions& options, const InputFile& input, const PageParts& page, const Json& document) {
-    OutputFile file(options.output, {input.path(), options.page}, options.force);
+void writePage(OutputFile& file, const ViewOptions& options, const InputFile& input, const PageParts& page,
+               const Json& document) {
     std::ofstream stream = openOutput(file.temporaryPath(), options.output + ":");
     const std::string text = scriptText(document);
     const std::size_t end = options.embed ? text.size() - std::strlen("\"}") : text.size(); // behind the address
@@ -129,8 +129,8 @@ ExitCode runView(const ViewOptions& options) {
     if (recording.parser().getAvailableMetaDataUUIDs().empty())
         return complainAboutNothing(recording, {});
     const PageParts page(options);
-    const Json document = viewDocument(recording, movieFor(options, input, recording));
-    writePage(options, input, page, document);
+    OutputFile file(options.output, {input.path(), options.page}, options.force);
+    writePage(file, options, input, page, viewDocument(recording, movieFor(options, input, recording)));
     if (!recording.validation().isDamaged())
         return ExitFine;
     complain(fmt::format("{}: is damaged, the page shows what could be read; 'zulm verify {}' says more", input.name(),

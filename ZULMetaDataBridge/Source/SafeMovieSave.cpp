@@ -196,6 +196,7 @@ void Save::verify(const std::vector<Candidate>& candidates) {
     const auto parser = parserOver(movie);
     for (const Candidate& candidate : candidates) {
         const auto range = parser->fileDataForUUID(candidate.stream.type);
+        requireReadable(movie);
         if (range.offset != candidate.stream.offset || range.length != candidate.stream.bytes)
             fail("does not show its stream of the kind " + kindText(candidate.stream.type) + " at offset " +
                  std::to_string(candidate.stream.offset) + " to a reader");
@@ -226,6 +227,7 @@ StampResult Save::stamp(const ZCAPHeader& info) {
     transaction_.endAtom();
     std::ifstream movie = openMovie(movie_);
     const auto infos = readRecordingInfo(*parserOver(movie));
+    requireReadable(movie);
     if (infos.empty() || std::memcmp(&infos.back(), &info, sizeof info) != 0)
         fail("does not show its recording info to a reader");
     result.info = infos.back();

@@ -2,6 +2,7 @@
 
 import pathlib
 import resource
+import shutil
 import struct
 
 import check
@@ -12,7 +13,14 @@ NUMBERS = [0, 1, 2, 3, 4, 5, 6, 7, 8, 15, 16, 17, 23, 24, 2**31 - 1, 2**31, 2**3
 SECONDS = 1     # of the processor: others may keep it busy
 SAMPLE = 6      # in the short form the tool is run on every 6th file, and on all crowds
 MANY = 1 << 20  # bytes of a file of nothing but small items
-COMMANDS = (["verify"], ["atoms"], ["info"], ["salvage", "--force", "-o"], ["repair", "--dry-run"])
+FULL_BOX = struct.pack(">I", 0)  # version and flags, in front of an atom's own fields
+
+# FILE is the file, OUT does not matter.
+COMMANDS = ("verify FILE", "atoms FILE", "info FILE", "dump FILE", "grep x FILE", "diff FILE FILE",
+            "salvage FILE --force -o OUT", "extract FILE --force -o OUT", "redact FILE --keys --force -o OUT",
+            "convert --to srt FILE", "repair --dry-run FILE")
+OF_CONTAINERS = ("atoms", "extract", "redact", "convert")
+OF_MOVIES = ("repair",)
 
 
 def with_number(contents, offset, form, number):
@@ -36,16 +44,20 @@ def variants(name, contents, fields):
             yield f"{stem}-{label}-{number}.{extension}", with_number(contents, offset, form, number)
 
 
-def movie_fields(contents):
-    """Both forms of every atom's size: the short one in front, the extended one behind the type."""
+def atom_fields(contents, *labels):
+    """Both forms of each atom's size: the short one in front, the extended one behind the type."""
     fields, position = {}, 0
-    for label in ("ftyp", "mdat", "ZULM", "DATA", "DATA"):
+    for label in labels:
         position = contents.index(label.encode(), position + 1) - 4
         number = sum(key.startswith(label) for key in fields)
         fields[f"{label}{number}short"] = (position, ">I")
         fields[f"{label}{number}long"] = (position + 8, ">Q")
         position += 4
     return fields
+
+
+def movie_fields(contents):
+    return atom_fields(contents, "ftyp", "mdat", "ZULM", "DATA", "DATA", "ZULR")
 
 
 def riff_fields(contents):
@@ -75,9 +87,38 @@ def stream_fields(kind, stream):
     return fields
 
 
+def cursor_images_of_version_1(kind):
+    """Its second entry stands for the image of the first."""
+    image = struct.pack("<IdQIii", 28 + 4, 1.0, 7, 8 + 4, 1, 1) + b"\x89PNG"
+    again = struct.pack("<IdQI", 20, 2.0, 7, 0)
+    return kind + struct.pack("<iI", 1, 0) + image + again
+
+
+def version_1_fields(stream):
+    begin, *_ = recordings.entry_ends(stream)
+    return {"entries": (20, "<I"), "entry": (begin, "<I"), "data": (begin + 20, "<I")}
+
+
 def extended_movie(streams):
     media = recordings.extended_atom(b"mdat", recordings.MEDIA)
-    return recordings.extended_atom(b"ftyp", b"mp42") + media + recordings.metadata_atom(streams)
+    return (recordings.extended_atom(b"ftyp", b"mp42") + media + recordings.metadata_atom(streams)
+            + recordings.RECORDING_INFO)
+
+
+def open_movie():
+    """Its media was never closed and stands behind a spare atom."""
+    return recordings.FILE_TYPE + recordings.atom(b"wide") + struct.pack(">I", 0) + b"mdat" + recordings.MEDIA
+
+
+def movie_with_duration(streams):
+    duration = recordings.atom(b"mvhd", FULL_BOX + struct.pack(">IIII", 0, 0, 600, 1200))
+    return recordings.movie(streams) + recordings.atom(b"moov", duration)
+
+
+def duration_fields(contents):
+    first = contents.index(b"mvhd") + 4
+    return atom_fields(contents, "moov", "mvhd") | {"version": (first, ">I"), "timescale": (first + 12, ">I"),
+                                                    "duration": (first + 16, ">I")}
 
 
 def crowds():
@@ -100,10 +141,16 @@ def cases(streams):
     yield from variants("movie.mp4", plain, movie_fields(plain))
     extended = extended_movie(two)
     yield from variants("extended.mp4", extended, movie_fields(extended))
+    spare = open_movie()
+    yield from variants("spare.mp4", spare, atom_fields(spare, "wide", "mdat"))
+    timed = movie_with_duration(two)
+    yield from variants("timed.mp4", timed, duration_fields(timed))
     riff = recordings.riff(two)
     yield from variants("riff.avi", riff, riff_fields(riff))
     for kind, stream in streams.items():
         yield from variants(f"{kind}.dat", stream, stream_fields(kind, stream))
+    old = cursor_images_of_version_1(streams["cursorImage"][:16])
+    yield from variants("cursorImageV1.dat", old, version_1_fields(old))
     yield from crowds()
 
 
@@ -113,21 +160,33 @@ def processor_seconds():
     return used.ru_utime + used.ru_stime
 
 
+def remove(path):
+    if path.is_dir():
+        shutil.rmtree(path)
+    else:
+        path.unlink(missing_ok=True)
+
+
+def suits(command, extension):
+    return not (command in OF_CONTAINERS and extension == ".dat" or command in OF_MOVIES and extension != ".mp4")
+
+
 def run_tool(context, file, result):
-    """The five looks that a person would take at a broken file."""
-    for command in COMMANDS:
-        arguments = [*command, *([context.folder / "salvaged"] if command[-1] == "-o" else []), file]
-        if command[0] in ("atoms",) and file.suffix == ".dat" or command[0] == "repair" and file.suffix != ".mp4":
+    """What a person would try with a broken file."""
+    words = {"FILE": file, "OUT": context.folder / f"out{file.suffix}"}
+    for command, *arguments in map(str.split, COMMANDS):
+        if not suits(command, file.suffix):
             continue
         before = processor_seconds()
-        done = check.run([context.zulm, *arguments], timeout=60)
+        done = check.run([context.zulm, command, *(words.get(word, word) for word in arguments)], timeout=60)
         seconds = processor_seconds() - before
         result.cases += 1
         result.crashed += done.returncode < 0
         if done.returncode not in (0, 1, 3, 4):
-            result.failures.append(f"zulm {command[0]} {file.name} ends with {done.returncode}")
+            result.failures.append(f"zulm {command} {file.name} ends with {done.returncode}")
         if seconds > SECONDS:
-            result.failures.append(f"zulm {command[0]} {file.name} takes {seconds:.1f} s")
+            result.failures.append(f"zulm {command} {file.name} takes {seconds:.1f} s")
+        remove(words["OUT"])
 
 
 def run_library(context, files, result):

@@ -16,7 +16,7 @@ FAULTS = (("eio", 0), ("eio", 1), ("enospc", 0), ("enospc", 1), ("full", 0), ("e
           ("short", 1))
 INVISIBLE = {"eintr", "short"}
 OUTPUTS = ("Out.mp4", "Out.srt", "Out.html", "out")
-REASONS = ("Input/output error", "No space left on device", "to a reader")
+REASONS = ("Input/output error", "No space left on device")
 
 MESSAGES = ("Couldn't open output file for appending meta data: ", "Couldn't open meta data file: ",
             "Found a non DATA atom mixed in the ZUL meta data", "Can't parse metadata. Unable to open file: ", "MetaDataReader<T>::parseFile - Version is larger ")
@@ -92,8 +92,7 @@ def without_temporaries(files):
 
 
 def says_which_file_and_why(case, errors, usual):
-    """A line that a run without faults does not have, with a file in front and the reason behind it. Where the movie is
-    read back, what is not there is the reason."""
+    """A line that a run without faults does not have, with a file in front and the reason behind it."""
     names = [*case.files, *OUTPUTS, "standard output", ".:", "./."]
     lines = [line for line in errors.splitlines() if line not in usual]
     return any(line.startswith("zulm: " + name) and line.partition("; ")[0].endswith(REASONS)

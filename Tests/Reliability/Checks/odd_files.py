@@ -19,6 +19,7 @@ from recordings import fast_folder
 
 NOBODY = 65534
 STREAM = "cursorLocation.dat"
+PAGE = "Page.html"
 
 # ---- What the tool does: how it ends, and what it then says --------------------------------------------------
 
@@ -75,6 +76,8 @@ READERS = {
     "diff": ["diff", "{}", "Recording.mp4"],
     "attach --from": ["attach", "Movie.mp4", "--from", "{}", "-o", "out.mp4"],
     "repair --dry-run": ["repair", "--dry-run", "{}"],
+    "grep": ["grep", ".", "{}"],
+    "view": ["view", "{}", "--page", PAGE, "-o", "out.html"],
 }
 CHANGERS = {
     "attach": ["attach", "{}", STREAM, "--replace", "--in-place"],
@@ -87,6 +90,7 @@ OUTPUTS = {
     "stamp": ["stamp", "Movie.mp4", "--creator", "R", "--creator-version", "1", "-o", "{}", "--force"],
     "redact": ["redact", "Recording.mp4", "--keys", "-o", "{}", "--force"],
     "convert": ["convert", "--to", "srt", "Recording.mp4", "-o", "{}", "--force"],
+    "view": ["view", "Recording.mp4", "--page", PAGE, "-o", "{}", "--force"],
 }
 INTO_FOLDERS = {
     "extract": ["extract", "Recording.mp4", "-o", "{}"],
@@ -254,8 +258,16 @@ def unexpected(ended, expected, path):
     return "" if text in errors and names_it else f"should say {text!r} of the file"
 
 
+def is_file(path):
+    try:
+        return path.is_file()
+    except OSError:  # whose name is too long
+        return False
+
+
 def usual_files(streams):
-    return {"Movie.mp4": OPEN_MOVIE, "Recording.mp4": recording(streams), STREAM: streams["cursorLocation"]}
+    return {"Movie.mp4": OPEN_MOVIE, "Recording.mp4": recording(streams), STREAM: streams["cursorLocation"],
+            PAGE: b"<head></head>"}
 
 
 def check_commands(zulm, top, files, commands, thing, expected, contents, result):
@@ -266,6 +278,10 @@ def check_commands(zulm, top, files, commands, thing, expected, contents, result
             kept = {file: (place.root / file).read_bytes() for file in files}
             if ended and not problem and kept != files:
                 problem = "changes another file"
+            odd = place.root / place.path
+            changes = expected == FINE and commands is not READERS
+            if ended and not problem and is_file(odd) and (odd.read_bytes() != contents) != changes:
+                problem = "leaves the file as it is" if changes else "changes the file"
             note(f"{name} with {thing}", ended, problem, result)
 
 
@@ -369,12 +385,24 @@ def check_limited_recorder(recorder, top, is_ignored, result):
         note("recording with a limit", ended, "" if is_right and is_kept else "ends otherwise", result)
 
 
+PRINTING = {
+    **{name: [argument.replace("{}", "Recording.mp4") for argument in READERS[name]]
+       for name in ("info", "dump", "verify", "atoms", "convert", "grep")},
+    **{f"{name} --json": [name, "--json", "Recording.mp4"] for name in ("info", "verify", "atoms")},
+    "repair --dry-run": ["repair", "--dry-run", "Movie.mp4"],
+    "salvage --json": ["salvage", "--json", "Recording.mp4", "-o", "out"],
+    "extract --json": ["extract", "--json", "Recording.mp4", "-o", "extracted"],
+    "diff": ["diff", "Recording.mp4", STREAM],
+    "--help": ["--help"],
+    "--version": ["--version"],
+}
+
+
 def check_full_device(zulm, top, streams, result):
     with Place(top, usual_files(streams), "nothing", b"", ".mp4") as place, open("/dev/full", "wb") as full:
-        for name in ("info", "dump", "verify", "atoms"):
-            arguments = as_nobody([zulm, name, "Recording.mp4"])
-            ended = subprocess.run([os.fspath(a) for a in arguments], stdout=full, stderr=subprocess.PIPE, timeout=20,
-                                   cwd=place.root, check=False)
+        for name, words in PRINTING.items():
+            ended = subprocess.run([os.fspath(a) for a in as_nobody([zulm, *words])], stdout=full,
+                                   stderr=subprocess.PIPE, timeout=20, cwd=place.root, check=False)
             ended.stdout = b""
             expected = (1, "standard output: cannot be written: No space left on device")
             note(f"{name} to /dev/full", ended, unexpected(ended, expected, "standard output"), result)

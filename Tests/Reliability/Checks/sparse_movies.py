@@ -113,8 +113,9 @@ def run(context):
     result = check.Result()
     stream = context.folder / "cursorLocation.dat"
     stream.write_bytes(recordings.shortened(recordings.demo_streams(context)["cursorLocation"], 4096))
-    for length in LENGTHS:
-        for has_spare in (False, True):
+    for has_spare in (False, True):
+        head = len(recordings.FILE_TYPE + (WIDE if has_spare else b""))
+        for length in (*LENGTHS, *(length - head for length in LENGTHS[:3])):  # and so long is the whole movie
             movie = Movie(context, result, length, has_spare, stream)
             movie.check_format()
             movie.check_safe()

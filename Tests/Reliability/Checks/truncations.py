@@ -32,9 +32,13 @@ def files(context, streams):
     for kind, stream in streams.items():
         made[f"{kind}.dat"] = recordings.shortened(stream, 600)
     if context.full:
-        large = list(recordings.shortened_all(streams, LARGE - 1024).values())
+        share = (LARGE - 1024) // len(streams)
+        large = [recordings.lengthened(stream, share) for stream in streams.values()]
         made["large.mp4"] = recordings.movie(large)
-        made["large.dat"] = recordings.shortened(streams["topmostWindowTitle"] * 1, LARGE)
+        made["large.avi"] = recordings.riff(large)
+        made["large.wav"] = recordings.riff(large, b"WAVE")
+        for kind in ("cursorLocation", "topmostWindowTitle", "cursorImage"):
+            made[f"large-{kind}.dat"] = recordings.lengthened(streams[kind], LARGE)
     for name, contents in made.items():
         (context.folder / name).write_bytes(contents)
     return {name: context.folder / name for name in made}
@@ -86,17 +90,21 @@ def verify(context, name, contents, result):
 def run(context):
     chosen = files(context, recordings.demo_streams(context))
     result = check.Result()
-    large = [path for name, path in chosen.items() if name.startswith("large")]
     others = [path for name, path in chosen.items() if not name.startswith("large")]
+    groups = [others, *([path] for path in chosen.values() if path not in others)]
+    repaired = 0
     with concurrent.futures.ThreadPoolExecutor(2) as pool:
-        jobs = [pool.submit(in_process, context, group) for group in (others, large) if group]
+        jobs = [pool.submit(in_process, context, group) for group in groups]
         for name, path in chosen.items():
             verify(context, name, path.read_bytes(), result)
         for done in (job.result() for job in jobs):
             result.failures += done.stderr.decode(errors="replace").splitlines()
             result.crashed += done.returncode != 0
             if done.returncode == 0:
-                cases, lost = map(int, done.stdout.split())
+                cases, lost, repairs = map(int, done.stdout.split())
                 result.cases += cases
                 result.lost += lost
+                repaired += repairs
+    if repaired == 0:
+        result.failures.append("no movie was cut in a way that can be repaired safely")
     return result

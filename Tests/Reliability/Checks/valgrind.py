@@ -29,6 +29,12 @@ def programs(context):
     return [program for program in found if context.full or not program.name.startswith("Tools.")]
 
 
+def replays(context):
+    """The fuzz targets, which go through their corpora, and these."""
+    targets = sorted((context.build.with_name("dev") / "Fuzz").glob("fuzz_*"))
+    return [(target, context.source / "Fuzz/corpus" / target.name.removeprefix("fuzz_")) for target in targets]
+
+
 def complaint(name, done):
     """What memcheck or the program itself complains of; None where both are content."""
     text = done.stderr.decode(errors="replace")
@@ -52,21 +58,38 @@ def run_program(program, folder):
     return result
 
 
+def run_replay(target, corpus, folder):
+    done = check.run([*MEMCHECK, target, corpus], timeout=3000, cwd=folder)
+    result = check.Result(cases=sum(1 for _ in corpus.iterdir()))
+    if reported := complaint(target.name, done):
+        result.crashed += 1
+        result.failures.append(reported)
+    elif done.returncode != 0:
+        result.failures.append(f"{target.name}: fails under valgrind: it ended with {done.returncode}")
+    return result
+
+
 def commands(context):
-    """A sample of what the tool does: reading, writing, damage."""
+    """What the tool does: reading, writing, damage."""
     streams = recordings.shortened_all(recordings.demo_streams(context), 3000)
     folder = context.folder / "tool"
     folder.mkdir()
     (folder / "r.mp4").write_bytes(recordings.movie(streams.values()))
     (folder / "torn.mp4").write_bytes(recordings.movie(streams.values())[:-1500])
     (folder / "m.mp4").write_bytes(recordings.FILE_TYPE + b"\0\0\0\0mdat" + recordings.MEDIA)
+    (folder / "change.mp4").write_bytes(recordings.FILE_TYPE + b"\0\0\0\0mdat" + recordings.MEDIA)
     (folder / "a.dat").write_bytes(streams["cursorLocation"])
+    (folder / "page.html").write_bytes(b"<head></head>")
     return folder, [
         ["info", "r.mp4"], ["atoms", "r.mp4"], ["dump", "--format", "ndjson", "r.mp4"], ["verify", "torn.mp4"],
         ["grep", "e", "r.mp4"], ["extract", "r.mp4", "-o", "out"], ["salvage", "torn.mp4", "-o", "rescued"],
         ["redact", "r.mp4", "--keys", "-o", "redacted.mp4"], ["attach", "m.mp4", "a.dat", "-o", "attached.mp4"],
         ["repair", "m.mp4", "-o", "repaired.mp4"], ["diff", "r.mp4", "torn.mp4"],
         ["stamp", "m.mp4", "-o", "s.mp4", "--creator", "C", "--creator-version", "1"],
+        ["attach", "change.mp4", "--from", "r.mp4", "--in-place"], ["dump", "--images", "images", "r.mp4"],
+        ["convert", "--to", "srt", "r.mp4"], ["convert", "--to", "chapters", "r.mp4"], ["info", "--json", "torn.mp4"],
+        ["view", "r.mp4", "--page", "page.html", "-o", "view.html"], ["verify", "--json", "r.mp4"], ["demo", "shown"],
+        ["info", "missing.mp4"], ["--help"], ["no-command"],
     ]
 
 
@@ -85,6 +108,7 @@ def run(context):
     folder, samples = commands(context)
     zulm = context.build.with_name("dev") / "Tools/zulm/zulm"
     jobs = [lambda program=program: run_program(program, context.folder) for program in programs(context)]
+    jobs += [lambda replay=replay: run_replay(*replay, context.folder) for replay in replays(context) if context.full]
     jobs += [lambda words=words: run_command(zulm, words, folder) for words in samples]
     result = check.Result()
     with concurrent.futures.ThreadPoolExecutor(WORKERS) as pool:

@@ -1,5 +1,5 @@
 // truncations FOLDER FILE...: cuts each file after every number of bytes and checks what the library makes of it.
-// Prints "CASES LOST"; on standard error what does not hold.
+// Prints "CASES LOST REPAIRED"; on standard error what does not hold.
 //
 // What decodes must be an exact prefix of what was recorded: every entry that is whole, and behind those at most the
 // one that the cut went through, which readers deliver with what is there of it.
@@ -98,6 +98,7 @@ public:
 
     std::uint64_t cases = 0;
     std::uint64_t lost = 0;
+    std::uint64_t repaired = 0; ///< movies, by the safe repair
 
 private:
     void check() {
@@ -212,9 +213,10 @@ private:
         if (Util::finalizeAtomsInFile(copy_) != isConsistent || contentsOf(copy_) != once)
             complain("a second repair does something else");
         writeFile(copy_, cut_);
-        const RepairPlan::State state = SafeMovieSave(copy_).plan().state;
-        if (state == RepairPlan::Repairable)
-            checkSafeRepair();
+        if (SafeMovieSave(copy_).plan().state != RepairPlan::Repairable)
+            return;
+        ++repaired;
+        checkSafeRepair();
     }
 
     void checkSafeRepair() {
@@ -246,14 +248,16 @@ private:
 int main(int argc, char** argv) {
     std::FILE* const results = fdopen(dup(STDOUT_FILENO), "w");
     silence();
-    std::uint64_t cases = 0;
-    std::uint64_t lost = 0;
+    unsigned long long cases = 0;
+    unsigned long long lost = 0;
+    unsigned long long repaired = 0;
     for (int i = 2; i < argc; ++i) {
         Cutter cutter(argv[1], argv[i]);
         cutter.cutEverywhere();
         cases += cutter.cases;
         lost += cutter.lost;
+        repaired += cutter.repaired;
     }
-    std::fprintf(results, "%llu %llu\n", static_cast<unsigned long long>(cases), static_cast<unsigned long long>(lost));
+    std::fprintf(results, "%llu %llu %llu\n", cases, lost, repaired);
     std::fclose(results);
 }
