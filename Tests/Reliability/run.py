@@ -34,7 +34,7 @@ CHECKS = {
 }
 FULL_ONLY = {"mutation"}
 MOST_SHOWN = 50  # failures of one check
-LONGEST = ["fuzzing", "mutation", "valgrind", "bit_flips"]  # started first
+LONGEST = ["fuzzing", "mutation", "valgrind", "truncations", "bit_flips"]  # started first
 
 
 def execute(name, arguments):
