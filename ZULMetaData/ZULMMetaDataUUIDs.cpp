@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <iostream>
+#include <sstream>
 
 namespace ZULMetaData {
 
@@ -9,6 +10,18 @@ const MetaDataKind* findMetaDataKind(const uuid& type) {
     const auto isWanted = [&type](const MetaDataKind& kind) { return kind.type == type; };
     const auto kind = std::find_if(s_metaDataKinds.begin(), s_metaDataKinds.end(), isWanted);
     return kind == s_metaDataKinds.end() ? nullptr : &*kind;
+}
+
+std::string uuidText(const uuid& type) {
+    std::ostringstream text;
+    text.exceptions(std::ios_base::badbit); // half an identifier is worse than std::bad_alloc
+    text << type;
+    return text.str();
+}
+
+std::string metaDataKindName(const uuid& type) {
+    const MetaDataKind* kind = findMetaDataKind(type);
+    return kind ? std::string(kind->name) : uuidText(type);
 }
 
 int MetaDataUUID::currentVersionForUUID(const uuid& type) {

@@ -8,6 +8,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <string>
 #include <string_view>
 
 namespace ZULMetaData {
@@ -97,6 +98,12 @@ inline constexpr std::array<MetaDataKind, 23> s_metaDataKinds{{
 
 /// The registered kind of a stream, or null. Silent, unlike `currentVersionForUUID`.
 ZULMETADATA_API const MetaDataKind* findMetaDataKind(const uuid& type);
+
+/// Its 36 characters, as `operator<<` writes them.
+ZULMETADATA_API std::string uuidText(const uuid& type);
+
+/// The name of a registered kind; of any other its identifier, as `uuidText` gives it.
+ZULMETADATA_API std::string metaDataKindName(const uuid& type);
 
 /// Versions by kind.
 struct ZULMETADATA_API MetaDataUUID {

@@ -122,7 +122,7 @@ constexpr double s_nothing = std::numeric_limits<double>::quiet_NaN();
 void summarise(ZulmRecording::Streams& streams, std::vector<Zulm::StreamInfo> infos) {
     streams.infos = std::move(infos);
     for (const Zulm::StreamInfo& info : streams.infos)
-        streams.names.push_back({Zulm::nameOf(info.type), Zulm::uuidText(info.type)});
+        streams.names.push_back({ZULMetaData::metaDataKindName(info.type), ZULMetaData::uuidText(info.type)});
     for (std::size_t i = 0; i < streams.infos.size(); ++i) {
         const Zulm::StreamInfo& info = streams.infos[i];
         streams.summaries.push_back({streams.names[i].kind.c_str(), streams.names[i].uuid.c_str(), info.version,
@@ -210,7 +210,7 @@ std::unique_ptr<ZulmEntries> readEntries(ZulmRecording& opened, const Zulm::Stre
     auto entries = std::make_unique<ZulmEntries>();
     if (!info.isDecodable)
         throw Zulm::Failure(fmt::format("{}: entries of {}, version {}, cannot be decoded", opened.recording.name(),
-                                        Zulm::nameOf(info.type), info.version));
+                                        ZULMetaData::metaDataKindName(info.type), info.version));
     RecordedKinds::visit(info.type, [&]<class Kind>() {
         EntryCollector<Kind> collector(*entries);
         opened.recording.readEntries<typename Kind::Value>(info, collector);

@@ -17,24 +17,12 @@
 #include <cerrno>
 #include <fstream>
 #include <optional>
-#include <sstream>
 #include <system_error>
 #include <utility>
 
 namespace ZULMetaData::Python {
 
 namespace {
-
-std::string textOf(const uuid& type) {
-    std::ostringstream text;
-    text << type;
-    return text.str();
-}
-
-std::string nameOf(const uuid& type) {
-    const MetaDataKind* kind = findMetaDataKind(type);
-    return kind ? std::string(kind->name) : textOf(type);
-}
 
 /// Throws `OSError` for a file that cannot be opened, `ValueError` where its name tells no container.
 std::unique_ptr<MetaDataParser> openRecording(const FileLocation& file) {
@@ -205,9 +193,9 @@ void addReading(py::module_& module) {
     py::class_<RecordedStream>(module, "RecordedStream",
                                "A stream of a recording: where it is, and what it says of itself.")
         .def_property_readonly(
-            "kind", [](const RecordedStream& stream) { return nameOf(stream.type); },
+            "kind", [](const RecordedStream& stream) { return metaDataKindName(stream.type); },
             "The name of its kind, or its UUID where that has none.")
-        .def_property_readonly("uuid", [](const RecordedStream& stream) { return textOf(stream.type); })
+        .def_property_readonly("uuid", [](const RecordedStream& stream) { return uuidText(stream.type); })
         .def_property_readonly("version", [](const RecordedStream& stream) { return stream.header.version; })
         .def_readonly("offset", &RecordedStream::offset, "Of its header in the file.")
         .def_readonly("bytes", &RecordedStream::bytes, "Header included, as the container declares.")
@@ -236,7 +224,7 @@ void addReading(py::module_& module) {
         "recorded_kinds",
         [] {
             std::vector<std::string> names;
-            RecordedKinds::forEach([&names]<class Kind>() { names.push_back(nameOf(Kind::type)); });
+            RecordedKinds::forEach([&names]<class Kind>() { names.push_back(metaDataKindName(Kind::type)); });
             return names;
         },
         "The names of all kinds that have entries.");
@@ -280,7 +268,7 @@ void addSaving(py::module_& module) {
         .def_readonly("has_loss", &RepairPlan::hasLoss, "Part of an interrupted append never got into the movie.");
     py::class_<AttachedStream>(module, "AttachedStream", "What became of one stream that was attached.")
         .def_readonly("name", &AttachedStream::name, "Of its source.")
-        .def_property_readonly("kind", [](const AttachedStream& stream) { return nameOf(stream.type); })
+        .def_property_readonly("kind", [](const AttachedStream& stream) { return metaDataKindName(stream.type); })
         .def_readonly("offset", &AttachedStream::offset, "Of its header in the movie.")
         .def_readonly("bytes", &AttachedStream::bytes, "Header and whole entries.")
         .def_readonly("entries", &AttachedStream::entries)

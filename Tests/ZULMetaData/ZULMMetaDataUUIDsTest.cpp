@@ -160,6 +160,18 @@ TEST(UnknownKind, IsNotFoundAndNotReportedThen) {
     EXPECT_EQ(output, "");
 }
 
+TEST(KindName, IsThatOfTheRegistry) {
+    EXPECT_EQ(metaDataKindName(s_cursorImageUUID), "cursorImage");
+    EXPECT_EQ(metaDataKindName(s_hoverRectUUID), "hoverRect");
+}
+
+TEST(KindName, IsTheIdentifierWhereNoKindIsRegistered) {
+    for (const std::string& id : s_unknown) {
+        EXPECT_EQ(metaDataKindName(identifier(id)), id);
+        EXPECT_EQ(uuidText(identifier(id)), id);
+    }
+}
+
 } // namespace
 
 } // namespace ZULMetaData::Test

@@ -55,7 +55,7 @@ Json fileDocument(const Recording& recording, const Layout& layout) {
 
 std::string remarkOn(const LayoutItem& entry) {
     if (entry.stream)
-        return nameOf(*entry.stream);
+        return metaDataKindName(*entry.stream);
     return entry.isForeign ? "foreign" : "";
 }
 

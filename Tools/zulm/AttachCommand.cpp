@@ -88,14 +88,15 @@ void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
         const std::uint64_t total = old.size();
         if (length < s_metaDataHeaderSize || length >= s_negativeLength) {
             complainAboutOldMovie(
-                options.from, fmt::format("{} at offset {} lies in an atom without room for it", nameOf(type), offset),
+                options.from,
+                fmt::format("{} at offset {} lies in an atom without room for it", metaDataKindName(type), offset),
                 streams);
             continue;
         }
         if (length > total - offset)
             complainAboutOldMovie(options.from,
-                                  fmt::format("{} at offset {} declares {} bytes, {} of which are there", nameOf(type),
-                                              offset, length, total - offset),
+                                  fmt::format("{} at offset {} declares {} bytes, {} of which are there",
+                                              metaDataKindName(type), offset, length, total - offset),
                                   streams);
         streams.sources.push_back(StreamSource::part(options.from, offset, length));
     }
@@ -120,7 +121,7 @@ void print(const std::string& name, const AttachResult& attached) {
     writeOutput(fmt::format("{}: {} stream{} attached\n", withoutControls(name), attached.streams.size(),
                             attached.streams.size() == 1 ? "" : "s"));
     for (const AttachedStream& stream : attached.streams)
-        writeOutput(fmt::format("  {:<23}  {:>9} {:<7}  {:>10} bytes\n", nameOf(stream.type), stream.entries,
+        writeOutput(fmt::format("  {:<23}  {:>9} {:<7}  {:>10} bytes\n", metaDataKindName(stream.type), stream.entries,
                                 stream.entries == 1 ? "entry" : "entries", stream.bytes));
 }
 
@@ -149,8 +150,8 @@ ExitCode complainAboutCuts(const AttachResult& attached) {
         if (stream.bytesCut == 0)
             continue;
         complain(fmt::format("{}: {} left out {} byte{} from offset {} of the stream on: {}", stream.name,
-                             nameOf(stream.type), stream.bytesCut, stream.bytesCut == 1 ? "" : "s", stream.bytes,
-                             cutText(stream.cutBecause)));
+                             metaDataKindName(stream.type), stream.bytesCut, stream.bytesCut == 1 ? "" : "s",
+                             stream.bytes, cutText(stream.cutBecause)));
         code = ExitDamaged;
     }
     return code;

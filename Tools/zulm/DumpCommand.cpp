@@ -47,7 +47,7 @@ public:
 
     /// `keys` are those of its entries; none where these cannot be decoded.
     void beginStream(const StreamInfo& stream, const EntryKeys* keys, bool isOnlyOne) {
-        kind_ = nameOf(stream.type);
+        kind_ = metaDataKindName(stream.type);
         keys_ = keys;
         if (options_.format == EntryFormat::Text && !isOnlyOne)
             writeOutput(heading(kind_) + '\n');
@@ -166,8 +166,8 @@ ExitCode dumpStream(Recording& recording, const DumpOptions& options, Printout& 
                            });
     if (!isDecoded) {
         printout.beginStream(stream, nullptr, isOnlyOne);
-        warn(fmt::format("{}: entries of {}, version {}, cannot be decoded", recording.name(), nameOf(stream.type),
-                         stream.version));
+        warn(fmt::format("{}: entries of {}, version {}, cannot be decoded", recording.name(),
+                         metaDataKindName(stream.type), stream.version));
     }
     printout.endStream();
     return code;

@@ -108,7 +108,7 @@ void createFolder(const std::string& folder) {
 
 std::string streamFileIn(const std::string& folder, const uuid& type, std::size_t number) {
     const std::string suffix = number > 1 ? fmt::format("-{}", number) : "";
-    return (std::filesystem::path(folder) / fmt::format("{}{}.dat", nameOf(type), suffix)).string();
+    return (std::filesystem::path(folder) / fmt::format("{}{}.dat", metaDataKindName(type), suffix)).string();
 }
 
 void requireFree(const std::vector<std::string>& outputs, bool force) {

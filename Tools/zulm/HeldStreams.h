@@ -17,7 +17,7 @@ struct HeldStream {
     std::uint64_t declared = 0; ///< bytes, header included
     std::uint64_t present = 0;  ///< of them, what the file holds
 
-    std::string name() const { return nameOf(type); }
+    std::string name() const { return ZULMetaData::metaDataKindName(type); }
     bool isCutShort() const { return present < declared; }
 };
 

@@ -3,7 +3,6 @@
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <sstream>
 #include <stdexcept>
 
 namespace Zulm {
@@ -124,20 +123,9 @@ std::string containerName(MetaDataParser::StreamType type) {
     }
 }
 
-std::string uuidText(const uuid& type) {
-    std::ostringstream text;
-    text << type;
-    return text.str();
-}
-
 nlohmann::ordered_json kindDocument(const uuid& type) {
     const MetaDataKind* kind = findMetaDataKind(type);
     return kind ? nlohmann::ordered_json(kind->name) : nlohmann::ordered_json(nullptr);
-}
-
-std::string nameOf(const uuid& type) {
-    const MetaDataKind* kind = findMetaDataKind(type);
-    return kind ? std::string(kind->name) : uuidText(type);
 }
 
 } // namespace Zulm

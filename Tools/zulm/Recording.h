@@ -128,13 +128,7 @@ private:
 /// "movie", "RIFF" or "stream".
 std::string containerName(ZULMetaData::MetaDataParser::StreamType type);
 
-/// The identifier as text.
-std::string uuidText(const ZULMetaData::uuid& type);
-
 /// The name of a registered kind, else null.
 nlohmann::ordered_json kindDocument(const ZULMetaData::uuid& type);
-
-/// "cursorLocation", or the identifier of a stream that is in no registry.
-std::string nameOf(const ZULMetaData::uuid& type);
 
 } // namespace Zulm

@@ -93,9 +93,10 @@ ExitCode complainAboutLoss(const std::string& name, const RedactedCopy& copy) {
         code = ExitDamaged;
         if (stream.bytesLeftOut > 0)
             complain(fmt::format("{}: {}: left out {} bytes behind its last whole entry", name,
-                                 nameOf(stream.header.uuid), stream.bytesLeftOut));
+                                 metaDataKindName(stream.header.uuid), stream.bytesLeftOut));
         else
-            complain(fmt::format("{}: {}: {}", name, nameOf(stream.header.uuid), removalText(stream.removal)));
+            complain(
+                fmt::format("{}: {}: {}", name, metaDataKindName(stream.header.uuid), removalText(stream.removal)));
     }
     if (copy.unreachableStreams() == 0)
         return code;
@@ -137,7 +138,7 @@ void report(const RedactOptions& options, const RedactedCopy& copy) {
 void print(const RedactOptions& options, const RedactedCopy& copy) {
     writeOutput(fmt::format("{}: written\n", options.output));
     for (const RedactedStream& stream : copy.streams()) {
-        const std::string name = nameOf(stream.header.uuid);
+        const std::string name = metaDataKindName(stream.header.uuid);
         if (stream.removal != RedactedStream::None)
             writeOutput(fmt::format("  {:<23}  {}\n", name, removalText(stream.removal)));
         else

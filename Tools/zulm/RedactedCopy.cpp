@@ -124,7 +124,7 @@ void RedactedCopy::requireNothingHidden() {
         if (isKept(stream.offset))
             throw Failure(fmt::format("{}: {} at offset {} is outside of the metadata and would stay in the copy; "
                                       "'zulm salvage {} -o DIR' shows what it is",
-                                      recording_.name(), nameOf(stream.header.uuid), stream.offset,
+                                      recording_.name(), metaDataKindName(stream.header.uuid), stream.offset,
                                       shellWord(recording_.name())));
         unreachable_ += stream.origin == SalvagedStream::Reachable ? 0 : 1;
     }

@@ -15,7 +15,7 @@
 namespace ZULMetaData {
 
 std::string StreamReport::name() const {
-    return kind.empty() ? detail::sentence(type) : kind;
+    return metaDataKindName(type);
 }
 
 std::vector<Finding> ValidationReport::allFindings() const {

@@ -12,7 +12,6 @@
 #include <cstring>
 #include <fstream>
 #include <memory>
-#include <sstream>
 #include <system_error>
 #include <utility>
 
@@ -21,15 +20,6 @@ namespace ZULMetaData {
 namespace {
 
 constexpr std::size_t s_pieceSize = 1 << 18;
-
-std::string kindText(const uuid& type) {
-    if (const MetaDataKind* kind = findMetaDataKind(type))
-        return std::string(kind->name);
-    std::ostringstream text;
-    text.exceptions(std::ios_base::badbit); // half an identifier is worse than std::bad_alloc
-    text << type;
-    return text.str();
-}
 
 std::ifstream openMovie(const FileLocation& movie) {
     std::ifstream file;
@@ -76,8 +66,8 @@ std::vector<Candidate> examine(const FileLocation& movie, const std::vector<Stre
         const auto first = std::find_if(candidates.begin(), candidates.end(),
                                         [&](const auto& candidate) { return candidate.stream.type == added.type; });
         if (&first->stream != &added)
-            throw SaveError(added.name,
-                            "a second stream of the kind " + kindText(added.type) + ", beside " + first->stream.name);
+            throw SaveError(added.name, "a second stream of the kind " + metaDataKindName(added.type) + ", beside " +
+                                            first->stream.name);
     }
     return candidates;
 }
@@ -88,8 +78,8 @@ void refuseExisting(const FileLocation& path, const std::vector<Candidate>& cand
     for (const Candidate& candidate : candidates)
         if (const auto range = parser->fileDataForUUID(candidate.stream.type); range.offset != 0)
             throw SaveError(utf8Path(path),
-                            "has a stream of the kind " + kindText(candidate.stream.type) + " already, at offset " +
-                                std::to_string(range.offset),
+                            "has a stream of the kind " + metaDataKindName(candidate.stream.type) +
+                                " already, at offset " + std::to_string(range.offset),
                             SaveError::Reason::KindExists);
 }
 
@@ -198,7 +188,7 @@ void Save::verify(const std::vector<Candidate>& candidates) {
         const auto range = parser->fileDataForUUID(candidate.stream.type);
         requireReadable(movie);
         if (range.offset != candidate.stream.offset || range.length != candidate.stream.bytes)
-            fail("does not show its stream of the kind " + kindText(candidate.stream.type) + " at offset " +
+            fail("does not show its stream of the kind " + metaDataKindName(candidate.stream.type) + " at offset " +
                  std::to_string(candidate.stream.offset) + " to a reader");
         compare(movie, candidate);
     }
