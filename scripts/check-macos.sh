@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# Compiles and links the libraries, the tool and the example for macOS on both of its processors, warnings as errors.
+# Compiles and links the libraries, the tool and the examples for macOS on both of its processors, warnings as errors.
 # Nothing of it can be run here.
 set -euo pipefail
 cd "$(dirname "$0")/.."
@@ -53,8 +53,8 @@ for processor in aarch64 x86_64; do
         -DCMAKE_PROJECT_TOP_LEVEL_INCLUDES=cmake/macos/dependencies.cmake -DCMAKE_BUILD_TYPE=Debug -DZULM_BUILD_VIEWER=OFF \
         -DZULM_MACOS_PROCESSOR=$processor -DZULM_ZIG="$zig" -DZULM_MACOS_DEPENDENCIES="$dependencies" \
         -DZULMETADATA_BUILD_TESTS=OFF -DCMAKE_INSTALL_LIBDIR=lib -DZULMETADATA_BUILD_EXAMPLES=ON >/dev/null
-    cmake --build "build/macos/$processor" -j2 --target zulm record_and_read
+    cmake --build "build/macos/$processor" -j2
     for program in Tools/zulm/zulm Examples/record_and_read; do
-        file -b "build/macos/$processor/$program" | grep "^Mach-O 64-bit"
+        file -b "build/macos/$processor/$program" | grep "^Mach-O 64-bit ${processor/aarch64/arm64} executable"
     done
 done

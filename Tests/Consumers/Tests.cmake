@@ -41,6 +41,8 @@ zulm_add_cmake_consumer(find_package_clang_static find_package application
   -DEXPECT_TOOLS=${tools} -DEXPECT_VIEWER=$<BOOL:${ZULM_VIEWER}>)
 zulm_add_cmake_consumer(add_subdirectory add_subdirectory player
   -DZULMETADATA_SOURCE=${PROJECT_SOURCE_DIR} -DCMAKE_CXX_COMPILER=${CMAKE_CXX_COMPILER})
+zulm_add_cmake_consumer(fetch_content fetch_content application
+  -DZULMETADATA_SOURCE=${PROJECT_SOURCE_DIR} -DCMAKE_CXX_COMPILER=${CMAKE_CXX_COMPILER})
 zulm_add_cmake_consumer(examples ../../Examples "${CMAKE_CTEST_COMMAND};--no-tests=error"
   -DCMAKE_PREFIX_PATH=${shared} -DCMAKE_CXX_COMPILER=${CMAKE_CXX_COMPILER})
 
@@ -70,5 +72,5 @@ set_tests_properties(Consumers/find_package Consumers/examples Consumers/pkg_con
 set_tests_properties(Consumers/find_package_clang_static Consumers/pkg_config_static
   PROPERTIES FIXTURES_REQUIRED static_package)
 set_property(TEST Consumers/install_static Consumers/install_shared Consumers/find_package
-  Consumers/find_package_clang_static Consumers/add_subdirectory Consumers/examples Consumers/pkg_config
-  Consumers/pkg_config_static Consumers/symbols_of_core Consumers/symbols_of_bridge PROPERTY LABELS consumers)
+  Consumers/find_package_clang_static Consumers/add_subdirectory Consumers/fetch_content Consumers/examples
+  Consumers/pkg_config Consumers/pkg_config_static Consumers/symbols_of_core Consumers/symbols_of_bridge PROPERTY LABELS consumers)
