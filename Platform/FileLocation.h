@@ -7,7 +7,7 @@
 
 namespace ZULMetaData {
 
-using FileLocation = std::filesystem::path;
+using FileLocation = std::filesystem::path; ///< absolute, or relative to the working directory
 
 /// The file-system path as UTF-8. POSIX paths are handed on byte for byte, also where they are not valid UTF-8,
 /// so that every file that exists can be opened.

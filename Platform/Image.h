@@ -15,8 +15,8 @@ namespace ZULMetaData {
 
 /// What an encoded picture says of itself, for a caller who has to know before it is decoded.
 struct EncodedImageInfo {
-    std::uint32_t width;
-    std::uint32_t height;
+    std::uint32_t width;          ///< in pixels
+    std::uint32_t height;         ///< in pixels
     std::uint64_t decodingMemory; ///< bytes that decoding asks for at most, beside the encoded ones
 };
 
@@ -35,8 +35,8 @@ public:
     /// Reads the headers alone. Nothing where they already rule out that the file decodes.
     static std::optional<EncodedImageInfo> infoOfEncodedBytes(std::span<const std::uint8_t> encoded);
 
-    std::uint32_t width() const noexcept { return width_; }
-    std::uint32_t height() const noexcept { return height_; }
+    std::uint32_t width() const noexcept { return width_; }   ///< in pixels
+    std::uint32_t height() const noexcept { return height_; } ///< in pixels
 
     /// Valid as long as the image.
     std::span<const std::uint8_t> rgba() const noexcept { return rgba_; }

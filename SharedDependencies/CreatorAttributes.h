@@ -15,15 +15,15 @@ namespace ZULMetaData {
 /// behind its last whole character.
 class ZULMETADATA_API CreatorAttributes {
 public:
-    void setName(const std::string& name);
-    void setVersion(const std::string& version);
-    void setPlatformVersion(const std::string& platformVersion);
+    void setName(const std::string& name);       ///< in every movie the platform's, which readers look at
+    void setVersion(const std::string& version); ///< of the application that recorded
+    void setPlatformVersion(const std::string& platformVersion); ///< of the operating system, such as "6.1.0"
 
-    std::string name() const;
-    std::string version() const;
-    std::string platformVersion() const;
+    std::string name() const;            ///< up to its zero byte, or to the field's end where a file lacks that
+    std::string version() const;         ///< likewise
+    std::string platformVersion() const; ///< likewise
 
-    static std::string platformNameMac();
+    static std::string platformNameMac(); ///< "Mac", which is stored as the name wherever a movie is recorded
 
 private:
     char name_[24] = {};

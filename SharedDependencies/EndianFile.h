@@ -37,6 +37,7 @@ constexpr std::uint64_t swapInt(std::uint64_t value) {
     return swapped;
 }
 
+/// The same for 32 bits.
 constexpr std::uint32_t swapInt(std::uint32_t value) {
     return value << 24 | (value & 0xff00) << 8 | (value >> 8 & 0xff00) | value >> 24;
 }

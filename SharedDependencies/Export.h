@@ -6,5 +6,5 @@
 #if defined(ZULMETADATA_STATIC)
 #define ZULMETADATA_API
 #else
-#define ZULMETADATA_API __attribute__((visibility("default")))
+#define ZULMETADATA_API __attribute__((visibility("default"))) ///< in front of what programs may call
 #endif

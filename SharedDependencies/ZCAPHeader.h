@@ -11,8 +11,8 @@ namespace ZULMetaData {
 
 /// Written and read as it lies in memory, in the host's byte order (little-endian everywhere we run).
 struct ZCAPHeader {
-    std::int64_t headerVersion = 0;
-    CreatorAttributes creator;
+    std::int64_t headerVersion = 0; ///< of the record's layout; 1 is what is written
+    CreatorAttributes creator;      ///< what recorded, and on which system
 };
 
 static_assert(sizeof(ZCAPHeader) == 64);

@@ -30,7 +30,9 @@ struct ZULMETADATA_API ContainerItem {
     bool holdsStream() const;   ///< by its type
     bool holdsRecordingInfo() const; ///< by its type; at the top of a movie
 
-    std::uint64_t payloadOffset() const { return offset + headerSize; }
+    std::uint64_t payloadOffset() const { return offset + headerSize; } ///< in the file
+
+    /// Where the next item begins, but for a pad byte. Wraps around where the declared size does not fit 64 bits.
     std::uint64_t end() const { return offset + size; }
 
     /// Of the payload, 0 where the declared size does not even cover the header.
@@ -44,6 +46,7 @@ using ContainerVisitor = std::function<bool(const ContainerItem&)>;
 /// The items between `begin` and `end` of `stream`, which holds `total` bytes. Ends with the first item that nothing
 /// can follow: one with an open end, one whose end no file position can hold, or one that reaches beyond the total.
 /// All of these clear the stream's state first.
+///@{
 ZULMETADATA_API void visitAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
                                 const ContainerVisitor& visit);
 ZULMETADATA_API void visitChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
@@ -52,11 +55,14 @@ ZULMETADATA_API std::vector<ContainerItem> listAtoms(std::istream& stream, std::
                                                      std::uint64_t total);
 ZULMETADATA_API std::vector<ContainerItem> listChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end,
                                                       std::uint64_t total);
+///@}
 
 /// The items at the top of a container; none where `type` is a bare stream or unknown. A movie may hold hundreds of
 /// thousands: visiting them keeps none.
+///@{
 ZULMETADATA_API void visitTopLevel(std::istream& stream, MetaDataParser::StreamType type,
                                    const ContainerVisitor& visit);
 ZULMETADATA_API std::vector<ContainerItem> listTopLevel(std::istream& stream, MetaDataParser::StreamType type);
+///@}
 
 } // namespace ZULMetaData

@@ -17,15 +17,20 @@ namespace ZULMetaData {
 /// Made for one entry. Never looks at the state of the stream.
 class ZULMETADATA_API CursorImageWriter {
 public:
-    explicit CursorImageWriter(int version) : version_(version) {}
+    explicit CursorImageWriter(int version) : version_(version) {} ///< that of the stream
 
-    void Write(std::ostream& stream, const FieldInfo& field);
+    void Write(std::ostream& stream, const FieldInfo& field); ///< zeros where the field has no data
 
+    /// Computes the sizes of the record, then writes both parts of the entry.
     void WriteCursorImageMetaData(std::ostream& stream, const CursorImageSchema& schema, Record& record);
+
+    /// The first part alone, with the sizes that the record has.
     void WriteBaseInfo(std::ostream& stream, const CursorImageSchema& schema, Record& record);
+
+    /// The data part alone.
     void WriteMetaDataFields(std::ostream& stream, const CursorImageSchema& schema, Record& record);
 
-    std::uint32_t bytesWritten() const { return bytesWritten_; }
+    std::uint32_t bytesWritten() const { return bytesWritten_; } ///< of the entry, by all calls so far
 
 private:
     void writeSteps(std::ostream& stream, CursorImageSchema::Steps steps, Record& record);
@@ -37,10 +42,11 @@ private:
 /// Made for one entry.
 class ZULMETADATA_API CursorImageReader {
 public:
-    explicit CursorImageReader(int version) : version_(version) {}
+    explicit CursorImageReader(int version) : version_(version) {} ///< as the stream's header says
 
-    void Read(std::istream& stream, const FieldInfo& field);
+    void Read(std::istream& stream, const FieldInfo& field); ///< what the input lacks stays as it was
 
+    /// Both parts of an entry.
     void ReadCursorImageMetaData(std::istream& stream, const CursorImageSchema& schema, Record& record);
 
     /// Throws `std::runtime_error` "invalid meta data entry" where the input ends in front of one of the fields.
@@ -51,7 +57,7 @@ public:
     /// data nor size; one cut short by the end of the input is filled up with zeros.
     void ReadMetaDataFields(std::istream& stream, const CursorImageSchema& schema, Record& record);
 
-    void IgnoreLeftoverBytes(std::istream& stream, std::uint32_t count);
+    void IgnoreLeftoverBytes(std::istream& stream, std::uint32_t count); ///< fewer where the input ends
 
     /// Of the data part.
     std::uint32_t bytesLeft() const { return bytesLeft_; }

@@ -17,17 +17,18 @@ namespace ZULMetaData {
 
 /// Bytes of a movie that a repair replaces.
 struct RepairChange {
-    std::uint64_t offset = 0;
-    std::string before;
-    std::string after;  ///< as long as `before`; or empty, where the file's last bytes are cut off
-    std::string reason; ///< one sentence
+    std::uint64_t offset = 0; ///< in the movie
+    std::string before;       ///< what stands there now
+    std::string after;        ///< as long as `before`; or empty, where the file's last bytes are cut off
+    std::string reason;       ///< one sentence
 };
 
 /// What is wrong with a movie, and what mends it.
 struct RepairPlan {
+    /// An unrepairable movie has a finding, but no changes.
     enum State : std::int32_t { Whole, Repairable, Unrepairable };
 
-    State state = Whole;
+    State state = Whole;               ///< repairable where there are changes
     std::vector<RepairChange> changes; ///< each must be on the disk before the next is made
     std::string finding;               ///< what is wrong, in one sentence; empty where nothing is
     std::uint64_t offset = 0;          ///< of the atom that is wrong

@@ -22,10 +22,10 @@ namespace ZULMetaData {
 
 /// Where an entry is, counted from the stream's header on. The size counts all of it.
 struct StreamEntry {
-    std::uint64_t offset = 0;
-    std::uint64_t size = 0;
+    std::uint64_t offset = 0; ///< from the header's first byte on
+    std::uint64_t size = 0;   ///< in bytes; of an entry that carries its size, the size field is part of it
 
-    std::uint64_t end() const { return offset + size; }
+    std::uint64_t end() const { return offset + size; } ///< where the next entry begins
 };
 
 /// Walks forward once, reading large pieces; needs little memory but for the bytes of one entry.
@@ -70,8 +70,8 @@ private:
 /// A decoded entry.
 template <StreamValue T>
 struct TimedValue {
-    double time = 0;
-    T value{};
+    double time = 0; ///< in seconds
+    T value{};       ///< texts as they are stored, perhaps not UTF-8
 };
 
 /// An entry by the layout of its value. None where its bytes do not fit it: too few or too many, or an inner size that

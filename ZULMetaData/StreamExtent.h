@@ -24,10 +24,10 @@ struct StreamExtent {
         EmptyEntry,  ///< an entry that declares no bytes, where each carries its size: no reader gets past it
     };
 
-    MetaDataHeader header;
+    MetaDataHeader header;        ///< as it is stored, whatever it says
     std::uint64_t wholeBytes = 0; ///< header included
-    std::uint64_t entries = 0;
-    End end = AtEntry;
+    std::uint64_t entries = 0;    ///< whole ones
+    End end = AtEntry;            ///< why the walk ended
 };
 
 /// Gives how many bytes it read: fewer than asked for only where there are no more.

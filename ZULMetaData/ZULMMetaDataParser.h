@@ -21,13 +21,14 @@ namespace ZULMetaData {
 /// position: calls must not overlap.
 class ZULMETADATA_API MetaDataParser {
 public:
+    /// RIFF chunks, the atoms of a movie, or a stream file without a container around it.
     enum StreamType : std::int32_t { Unknown, Riff, QuickTime, RawStream };
 
     /// Where a stream is: from its header on. Both 0 for a kind that is not there. The length is what the
     /// container declares, which may be more than the file holds.
     struct CachedFileData {
-        std::uint64_t offset;
-        std::uint64_t length;
+        std::uint64_t offset; ///< of its header, in the file
+        std::uint64_t length; ///< in bytes, header included
     };
 
     /// Opens a file and keeps it open. The extension tells the container: .avi and .wav, .mp4, .mov and .zcap, or
@@ -42,8 +43,10 @@ public:
     static std::unique_ptr<MetaDataParser> create(std::istream& stream, StreamType type);
 
     virtual ~MetaDataParser() = default;
-    virtual StreamType getStreamType() const = 0;
-    virtual std::istream& getStream() = 0;
+    virtual StreamType getStreamType() const = 0; ///< as the extension of its file tells, or as `create` was told
+    virtual std::istream& getStream() = 0;        ///< stays the parser's, or the caller's; reading moves its position
+
+    /// Of a file: what was found stays known, but cannot be read. Of a caller's stream: nothing.
     virtual void close() = 0;
 
     MetaDataParser(const MetaDataParser&) = delete;
@@ -52,7 +55,7 @@ public:
     /// In ascending order.
     std::vector<uuid> getAvailableMetaDataUUIDs() const;
 
-    CachedFileData fileDataForUUID(const uuid& type) const;
+    CachedFileData fileDataForUUID(const uuid& type) const; ///< of several streams of a kind the last one
 
     /// Delivers a stream as `MetaDataReader<T>::parseStream` does; nothing where there is no such stream.
     template <StreamValue T>
@@ -79,6 +82,7 @@ namespace ParserUtil {
 /// -1 for a stream that has failed. Keeps the position.
 ZULMETADATA_API std::int64_t calcFileSize(std::istream& stream);
 
+/// Whether `needed` bytes lie between the stream's position, which stays, and the total.
 ZULMETADATA_API bool enoughBytesLeft(std::istream& stream, std::uint64_t total, std::uint64_t needed);
 
 /// Any 32-bit size below 8, not only 1, is followed by a 64-bit one. The size counts the whole atom.

@@ -47,6 +47,7 @@ struct MetaDataReader {
     static void parseStream(DataStreamObserver<T>& observer, std::istream& stream, std::uint64_t start,
                             std::uint64_t length, int version);
 
+    /// Whether `parseStream` accepts such a stream. An unknown kind may cause a line on standard output.
     static bool IsSupportedVersion(const MetaDataHeader& header, int version);
 };
 

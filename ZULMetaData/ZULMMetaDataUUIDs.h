@@ -20,7 +20,7 @@ struct MetaDataHeader {
     std::uint32_t fixedEntrySize = 0; ///< bytes of every entry, time included; 0 where each entry carries its size
 };
 
-inline constexpr std::size_t s_metaDataHeaderSize = 24;
+inline constexpr std::size_t s_metaDataHeaderSize = 24; ///< in bytes; the first entry begins there
 
 static_assert(sizeof(MetaDataHeader) == s_metaDataHeaderSize && std::is_trivially_copyable_v<MetaDataHeader>);
 static_assert(offsetof(MetaDataHeader, version) == 16 && offsetof(MetaDataHeader, fixedEntrySize) == 20);
@@ -36,6 +36,8 @@ constexpr uuid kindUUID(std::uint32_t firstGroup) {
 
 } // namespace detail
 
+/// What the header of a stream names its kind by.
+///@{
 // 2b7b6af4 is nobody's, and behind 2b7b6afc the numbering goes on at 2b7b6a00.
 inline constexpr uuid s_caretPositionUUID = detail::kindUUID(0x2b7b6aef);
 inline constexpr uuid s_cursorActionUUID = detail::kindUUID(0x2b7b6af0);
@@ -60,16 +62,19 @@ inline constexpr uuid s_topmostAppNameUUID = detail::kindUUID(0x2b7b6a06);
 inline constexpr uuid s_topmostWindowTitleUUID = detail::kindUUID(0x2b7b6a07);
 inline constexpr uuid s_cpuUsageUUID = detail::kindUUID(0x2b7b6a08);
 inline constexpr uuid s_hoverRectUUID = detail::kindUUID(0x2b7b6a09);
+///@}
 
+/// As `s_cursorImageUUID` is printed.
 inline constexpr const char* s_cursorImageUUIDAsString = "2b7b6af1-7a1f-11e2-83d0-0017f200be7f";
 
 /// One kind of stream: what it is called, how its header names it, and the version that is written today.
 struct MetaDataKind {
-    std::string_view name;
-    ZULMetaData::uuid type;
-    int currentVersion;
+    std::string_view name;  ///< such as "cursorLocation", everywhere that people meet it
+    ZULMetaData::uuid type; ///< in the headers of its streams
+    int currentVersion;     ///< readers know it and all before it, from 1 on
 };
 
+/// The registry, with the six kinds that nothing here writes.
 inline constexpr std::array<MetaDataKind, 23> s_metaDataKinds{{
     {"caretPosition", s_caretPositionUUID, 1},
     {"cursorAction", s_cursorActionUUID, 1},

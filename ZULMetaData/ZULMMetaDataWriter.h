@@ -55,7 +55,7 @@ public:
     /// May be called more than once.
     void close();
 
-    virtual std::ofstream& getStream() { return stream; }
+    virtual std::ofstream& getStream() { return stream; } ///< the writer's own; its state tells of failures
 
     /// Closes. An exception from closing (the stream's exception mask is the caller's) ends the process.
     ~MetaDataWriter() { close(); }
