@@ -38,15 +38,19 @@ concept PlatformTime = requires(const R& r) {
 
 /// A time as the platform's media services count it.
 struct MediaTime {
-    std::int64_t value = 0;
+    std::int64_t value = 0;     ///< in units of 1 / `timescale` seconds
     std::int32_t timescale = 0; ///< units of `value` in a second
-    std::uint32_t flags = 0;
-    std::int64_t epoch = 0;
+    std::uint32_t flags = 0;    ///< never looked at
+    std::int64_t epoch = 0;     ///< never looked at
 
     constexpr MediaTime() = default;
+
+    /// `timeValue / scale` seconds.
     constexpr MediaTime(std::int64_t timeValue, std::int32_t scale, std::uint32_t timeFlags = 0,
                         std::int64_t timeEpoch = 0)
         : value(timeValue), timescale(scale), flags(timeFlags), epoch(timeEpoch) {}
+
+    /// Converts a time of the platform.
     template <PlatformTime T>
     constexpr MediaTime(const T& time) : MediaTime(time.value, time.timescale, time.flags, time.epoch) {}
 
@@ -56,25 +60,31 @@ struct MediaTime {
 
 /// A position or a delta, in pixels; fractions are cut off where it is stored.
 struct ScreenPoint {
-    double x = 0;
-    double y = 0;
+    double x = 0; ///< horizontal; a position counts from the left edge of the display
+    double y = 0; ///< vertical; a position counts from the upper edge of the display
 
     constexpr ScreenPoint() = default;
-    constexpr ScreenPoint(double xValue, double yValue) : x(xValue), y(yValue) {}
+    constexpr ScreenPoint(double xValue, double yValue) : x(xValue), y(yValue) {} ///< horizontal, vertical
+
+    /// Converts a point of the platform.
     template <PlatformPoint P>
     constexpr ScreenPoint(const P& point) : ScreenPoint(point.x, point.y) {}
 };
 
 /// Origin and size, in pixels; fractions are cut off where it is stored.
 struct ScreenRect {
-    double x = 0;
-    double y = 0;
-    double width = 0;
-    double height = 0;
+    double x = 0;      ///< from the left edge of the display
+    double y = 0;      ///< from its upper edge
+    double width = 0;  ///< to the right
+    double height = 0; ///< downward
 
     constexpr ScreenRect() = default;
+
+    /// Origin, then size.
     constexpr ScreenRect(double xValue, double yValue, double widthValue, double heightValue)
         : x(xValue), y(yValue), width(widthValue), height(heightValue) {}
+
+    /// Converts a rectangle of the platform.
     template <PlatformRect R>
     constexpr ScreenRect(const R& rect) : ScreenRect(rect.origin.x, rect.origin.y, rect.size.width, rect.size.height) {}
 };
@@ -91,10 +101,12 @@ inline std::int32_t truncated(double coordinate) {
     return static_cast<std::int32_t>(coordinate);
 }
 
+/// Both coordinates, each as above.
 inline Point truncated(const ScreenPoint& point) {
     return {truncated(point.x), truncated(point.y)};
 }
 
+/// All four numbers, each as above: the size is no difference of truncated edges.
 inline Rect truncated(const ScreenRect& rect) {
     return {truncated(rect.x), truncated(rect.y), truncated(rect.width), truncated(rect.height)};
 }

@@ -14,6 +14,8 @@
 
 namespace ZULMetaData {
 
+/// A value as an entry holds it: unsigned integers keep their bits, reals are narrowed to 32 bits.
+///@{
 inline EntryValue entryValue(std::int32_t value) {
     return value;
 }
@@ -35,6 +37,7 @@ inline EntryValue entryValue(std::string value) {
 inline EntryValue entryValue(EntryValue value) {
     return value;
 }
+///@}
 
 /// A field whose value is a number of 32 bits, or becomes one.
 template <class Value>
@@ -42,6 +45,7 @@ concept NumberField = OneOf < std::remove_cvref_t<Value>,
         std::int32_t, std::uint32_t,
 float, double > ;
 
+/// The same for a number that the entry keeps inline.
 template <NumberField Value>
 EntryNumber entryNumber(Value value) {
     if constexpr (std::integral<Value>)

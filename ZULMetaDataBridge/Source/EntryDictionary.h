@@ -24,6 +24,7 @@ namespace ZULMetaData {
 
 class Image;
 
+/// What an entry holds under one key; each parser says of which types the values of its keys are.
 using EntryValue = std::variant<std::int32_t, std::int64_t, float, std::string, std::shared_ptr<const Image>>;
 
 /// What most kinds of entry consist of. A fifth of the size of an `EntryValue`.
@@ -39,10 +40,12 @@ using EntryKeys = std::vector<std::string>;
 /// become `EntryValue`s only where somebody asks for one.
 class ZULMETADATA_API EntryDictionary {
 public:
-    static constexpr std::size_t maxSize = 5;
+    static constexpr std::size_t maxSize = 5; ///< keys of an entry, "timestamp" included
+
+    /// In the order of the keys; what is left over behind them is unused.
     using Values = std::array<EntryValue, maxSize>;
-    using Numbers = std::array<EntryNumber, maxSize>;
-    using value_type = std::pair<const std::string&, const EntryValue&>;
+    using Numbers = std::array<EntryNumber, maxSize>;                    ///< likewise
+    using value_type = std::pair<const std::string&, const EntryValue&>; ///< key and value, valid as long as the entry
     class const_iterator;
 
     /// `keys` must outlive the entry; `values` are its values in the same order, at most `maxSize`.
@@ -55,12 +58,14 @@ public:
         return entry;
     }
 
-    EntryDictionary(const EntryDictionary& other);
+    EntryDictionary(const EntryDictionary& other); ///< shares the keys
+
+    /// Leaves `other` with its keys, whose values then mean nothing.
     EntryDictionary(EntryDictionary&& other) noexcept
         : keys_(other.keys_), numbers_(other.numbers_), values_(other.values_.load(std::memory_order_relaxed)) {
         other.values_.store(nullptr, std::memory_order_relaxed);
     }
-    EntryDictionary& operator=(EntryDictionary other) noexcept;
+    EntryDictionary& operator=(EntryDictionary other) noexcept; ///< copies or moves, as `other` was made
     ~EntryDictionary() { delete values_.load(std::memory_order_relaxed); }
 
     /// Throws `std::out_of_range` for a key that the entry lacks. Valid as long as the entry.
@@ -70,11 +75,11 @@ public:
     template <class T>
     T get(std::string_view key) const;
 
-    const_iterator find(std::string_view key) const;
-    bool contains(std::string_view key) const;
-    std::size_t size() const { return keys_->size(); }
-    const_iterator begin() const;
-    const_iterator end() const;
+    const_iterator find(std::string_view key) const;   ///< `end()` where the entry lacks the key
+    bool contains(std::string_view key) const;         ///< the same for every entry of a kind
+    std::size_t size() const { return keys_->size(); } ///< "timestamp" included
+    const_iterator begin() const;                      ///< at the kind's first key
+    const_iterator end() const;                        ///< behind "timestamp"
 
 private:
     explicit EntryDictionary(const EntryKeys& keys) noexcept : keys_(&keys) {}
@@ -87,25 +92,33 @@ private:
     mutable std::atomic<const Values*> values_ = nullptr; // owned
 };
 
+/// What `read` of a parser gives: the entries of a stream, in its order.
 using EntryList = std::vector<EntryDictionary>;
 
 /// Gives pairs of key and value.
 class EntryDictionary::const_iterator {
 public:
+    /// What algorithms ask of an iterator that makes its pairs as it goes.
+    ///@{
     using iterator_category = std::input_iterator_tag;
     using value_type = EntryDictionary::value_type;
     using difference_type = std::ptrdiff_t;
     using reference = value_type;
+    ///@}
 
     /// Keeps the pair that `->` gives access to.
     struct pointer {
-        value_type pair;
-        const value_type* operator->() const { return &pair; }
+        value_type pair;                                       ///< refers into the entry
+        const value_type* operator->() const { return &pair; } ///< valid as long as the pair
     };
 
     const_iterator() = default;
+
+    /// At the key of number `index`, counted from 0.
     const_iterator(const EntryDictionary& entry, std::size_t index) : entry_(&entry), index_(index) {}
 
+    /// As of any input iterator. What they give refers into the entry.
+    ///@{
     reference operator*() const { return {(*entry_->keys_)[index_], entry_->values()[index_]}; }
     pointer operator->() const { return {**this}; }
     const_iterator& operator++() {
@@ -114,6 +127,7 @@ public:
     }
     const_iterator operator++(int) { return std::exchange(*this, {*entry_, index_ + 1}); }
     friend bool operator==(const const_iterator&, const const_iterator&) = default;
+    ///@}
 
 private:
     const EntryDictionary* entry_ = nullptr;

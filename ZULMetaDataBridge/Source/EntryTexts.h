@@ -10,7 +10,7 @@
 
 namespace ZULMetaData {
 
-ZULMETADATA_API bool isUTF8(std::string_view bytes);
+ZULMETADATA_API bool isUTF8(std::string_view bytes); ///< overlong forms and surrogates are not
 
 /// Bytes of the whole, valid characters that `bytes` begins with.
 ZULMETADATA_API std::size_t validUTF8Length(std::string_view bytes);

@@ -24,23 +24,25 @@ namespace ZULMetaData {
 /// One key of an entry, and how its value is taken from what the stream holds.
 template <class Projection>
 struct Field {
-    const char* key;
-    Projection valueOf;
+    const char* key;    ///< under which entries hold it
+    Projection valueOf; ///< a member of the kind's value, or a function of it; gives what `entryValue` takes
 
+    /// Deduces the projection's type.
     constexpr Field(const char* fieldKey, Projection projection) : key(fieldKey), valueOf(projection) {}
 };
 
-inline constexpr std::tuple s_pointFields{Field{"x", &Point::x}, Field{"y", &Point::y}};
+inline constexpr std::tuple s_pointFields{Field{"x", &Point::x}, Field{"y", &Point::y}}; ///< of every kind of points
 
+/// Of every kind of rectangles.
 inline constexpr std::tuple s_rectFields{Field{"x", &Rect::x}, Field{"y", &Rect::y}, Field{"width", &Rect::width},
                                          Field{"height", &Rect::height}};
 
 /// Where the window on top was.
 struct TopmostWindowKind {
-    using Value = Rect;
-    static constexpr uuid type = s_topmostWindowUUID;
-    static constexpr int version = 1;
-    static constexpr auto fields = s_rectFields;
+    using Value = Rect;                               ///< what an entry holds beside its time
+    static constexpr uuid type = s_topmostWindowUUID; ///< in the header of the stream
+    static constexpr int version = 1;                 ///< that is written, and read with all before it
+    static constexpr auto fields = s_rectFields;      ///< the keys of its entries; "timestamp" follows them
 };
 
 /// What the cursor hovered over.
@@ -161,10 +163,12 @@ struct CursorActionKind {
                                        Field{"rawActionValue", std::identity{}}};
 };
 
+/// "characterString" of an entry, by `HumanReadableActions::KeyboardActionCodeToString`.
 inline std::string keyText(const KeyStroke& key) {
     return HumanReadableActions::KeyboardActionCodeToString(static_cast<std::int32_t>(key.characterCode));
 }
 
+/// "eventFlagsString" of an entry, by `HumanReadableActions::KeyboardModifiersToString`.
 inline std::string keyModifiersText(const KeyStroke& key) {
     return HumanReadableActions::KeyboardModifiersToString(static_cast<std::int32_t>(key.eventFlagsCode));
 }
@@ -200,7 +204,7 @@ struct SystemDataKind {
 /// Kinds as a type, so that code can be made for each of them.
 template <class... Kinds>
 struct KindList {
-    static constexpr std::size_t size = sizeof...(Kinds);
+    static constexpr std::size_t size = sizeof...(Kinds); ///< kinds in the list
 
     /// Calls `visit.template operator()<Kind>()` for every kind.
     template <class Visit>

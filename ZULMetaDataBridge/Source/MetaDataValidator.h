@@ -25,6 +25,7 @@ namespace ZULMetaData {
 /// Damage: something is lost, cannot be reached, or contradicts itself. Notice: worth knowing, but all can be read.
 enum class Severity { Damage, Notice };
 
+/// What can be said of a file. `s_findingRules` tells what each of these means.
 enum class FindingCode : std::size_t {
     TrailingBytes,
     OpenEndedAtom,
@@ -67,12 +68,13 @@ enum class FindingCode : std::size_t {
 
 /// What a code is called wherever it is shown, how bad it is, and what it means.
 struct FindingRule {
-    FindingCode code;
-    Severity severity;
-    std::string_view name;
-    std::string_view meaning;
+    FindingCode code;         ///< whose rule this is
+    Severity severity;        ///< the same wherever it is found
+    std::string_view name;    ///< such as "torn-entry"
+    std::string_view meaning; ///< in a few words, whatever the file
 };
 
+/// By the numbers of their codes.
 inline constexpr std::array<FindingRule, 37> s_findingRules{{
     {FindingCode::TrailingBytes, Severity::Damage, "trailing-bytes", "too few bytes for another atom or chunk"},
     {FindingCode::OpenEndedAtom, Severity::Damage, "open-ended-atom", "an atom without a size: nothing follows it"},
@@ -122,36 +124,37 @@ static_assert(
     }(),
     "one rule for every code, in their order");
 
+/// Every code has one.
 constexpr const FindingRule& ruleOf(FindingCode code) {
     return s_findingRules[static_cast<std::size_t>(code)];
 }
 
 /// Something worth telling about a file, and where it stands.
 struct Finding {
-    FindingCode code;
+    FindingCode code;     ///< what was found
     std::string place;    ///< the stream's kind (its identifier where that has no name), or the type of the atom, in
                           ///< which bytes that cannot be printed are `\xNN`
     std::uint64_t offset; ///< in the file: of the atom, the entry, the header's field, the image or the bad character
-    std::string sentence;
+    std::string sentence; ///< for people, with the numbers in question
 
-    Severity severity() const { return ruleOf(code).severity; }
+    Severity severity() const { return ruleOf(code).severity; } ///< by the rule of its code
 };
 
 /// One stream, walked from its header to its end or to the first entry behind which no other can be found.
 struct ZULMETADATA_API StreamReport {
-    uuid type{};
-    std::string kind; ///< its name in the registry; empty where it is not registered
-    std::int32_t version = -1;
-    std::uint32_t fixedEntrySize = 0;
-    std::uint64_t offset = 0;        ///< of the header in the file
-    std::uint64_t declaredBytes = 0; ///< header included, as the container says
-    std::uint64_t presentBytes = 0;  ///< of them, what lies inside the container
-    std::uint64_t wholeEntries = 0;  ///< that are there from end to end and fit their own sizes
-    std::uint64_t readableBytes = 0; ///< header included, up to the first entry that does not: safe for every reader
-    std::optional<double> firstTime; ///< seconds, of the first and the last entry with a finite time
-    std::optional<double> lastTime;
-    bool isReachable = true; ///< whether readers find it
-    std::vector<Finding> findings;
+    uuid type{};                      ///< as its header says; all zero where that is cut short
+    std::string kind;                 ///< its name in the registry; empty where it is not registered
+    std::int32_t version = -1;        ///< of its entries, as its header says; -1 where that is cut short
+    std::uint32_t fixedEntrySize = 0; ///< as its header says, right or wrong; 0 where each entry carries its size
+    std::uint64_t offset = 0;         ///< of the header in the file
+    std::uint64_t declaredBytes = 0;  ///< header included, as the container says
+    std::uint64_t presentBytes = 0;   ///< of them, what lies inside the container
+    std::uint64_t wholeEntries = 0;   ///< that are there from end to end and fit their own sizes
+    std::uint64_t readableBytes = 0;  ///< header included, up to the first entry that does not: safe for every reader
+    std::optional<double> firstTime;  ///< seconds, of the first entry with a finite time
+    std::optional<double> lastTime;   ///< seconds, of the last entry with a finite time
+    bool isReachable = true;          ///< whether readers find it
+    std::vector<Finding> findings;    ///< inside this stream
 
     /// Its kind, or its identifier where that has no name.
     std::string name() const;
@@ -161,10 +164,10 @@ struct ZULMETADATA_API StreamReport {
 struct ZULMETADATA_API ValidationReport {
     /// More of either severity are only counted, so that the report stays small whatever the file.
     static constexpr std::size_t s_maximumFindings = 1000;
-    static constexpr std::size_t s_maximumStreams = 1000;
+    static constexpr std::size_t s_maximumStreams = 1000; ///< streams in the report; more are walked, but only counted
 
-    MetaDataParser::StreamType container = MetaDataParser::Unknown;
-    std::uint64_t bytes = 0;           ///< in the file
+    MetaDataParser::StreamType container = MetaDataParser::Unknown; ///< by the file's extension, or as the caller said
+    std::uint64_t bytes = 0;                                        ///< in the file
     std::uint64_t streamCount = 0;     ///< `streams.size()`, or more where not all are listed
     std::uint64_t wholeEntries = 0;    ///< of all streams
     std::uint64_t damageCount = 0;     ///< findings, listed or not
@@ -172,9 +175,9 @@ struct ZULMETADATA_API ValidationReport {
     std::vector<StreamReport> streams; ///< in the order of the file
     std::vector<Finding> findings;     ///< of the container
 
-    bool isDamaged() const { return damageCount > 0; }
-    bool hasMetaData() const { return streamCount > 0; }
-    std::vector<Finding> allFindings() const; ///< in the order of their offsets
+    bool isDamaged() const { return damageCount > 0; }   ///< notices are no damage
+    bool hasMetaData() const { return streamCount > 0; } ///< streams, whole or not
+    std::vector<Finding> allFindings() const;            ///< in the order of their offsets
 };
 
 /// The extension tells the container, as for `MetaDataParser`. Throws `std::runtime_error` for a file that cannot be

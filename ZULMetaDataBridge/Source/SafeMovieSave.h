@@ -24,19 +24,21 @@ namespace ZULMetaData {
 /// Why a movie was not changed as it should: one sentence about one file.
 class ZULMETADATA_API SaveError : public std::runtime_error {
 public:
+    /// What became of the movie.
     enum class Reason {
         Failed,     ///< the movie is what it was
         KindExists, ///< so it is, and has a stream of that kind already
         NotUndone,  ///< the operation failed, and the movie could not be made what it was
     };
 
+    /// `what()` gives both: the file, a colon and the sentence.
     SaveError(const std::string& file, const std::string& sentence, Reason reason = Reason::Failed)
         : std::runtime_error(file + ": " + sentence), file_(file), sentence_(sentence), reason_(reason) {}
 
     /// The movie's path, or the name of a stream's source.
     const std::string& file() const { return file_; }
-    const std::string& sentence() const { return sentence_; }
-    Reason reason() const { return reason_; }
+    const std::string& sentence() const { return sentence_; } ///< without the file
+    Reason reason() const { return reason_; }                 ///< tells what became of the movie
 
 private:
     std::string file_;
@@ -46,19 +48,19 @@ private:
 
 /// What became of one stream.
 struct AttachedStream {
-    std::string name; ///< of its source
-    uuid type{};
-    std::uint64_t offset = 0; ///< of its header in the movie
-    std::uint64_t bytes = 0;  ///< header and whole entries
-    std::uint64_t entries = 0;
-    std::uint64_t bytesCut = 0; ///< left out, from `bytes` on in the source
-    StreamExtent::End cutBecause = StreamExtent::AtEntry;
+    std::string name;                                     ///< of its source
+    uuid type{};                                          ///< its kind
+    std::uint64_t offset = 0;                             ///< of its header in the movie
+    std::uint64_t bytes = 0;                              ///< header and whole entries
+    std::uint64_t entries = 0;                            ///< all that are whole
+    std::uint64_t bytesCut = 0;                           ///< left out, from `bytes` on in the source
+    StreamExtent::End cutBecause = StreamExtent::AtEntry; ///< `AtEntry` where nothing was cut
 };
 
 /// What was done to the movie.
 struct AttachResult {
-    RepairPlan repair; ///< what was done before
-    std::vector<AttachedStream> streams;
+    RepairPlan repair;                   ///< what was done before
+    std::vector<AttachedStream> streams; ///< in the order in which they were given
 };
 
 /// What was done to the movie.
@@ -84,7 +86,7 @@ public:
     /// operation.
     using Progress = std::function<void(std::uint64_t done, std::uint64_t total)>;
 
-    explicit SafeMovieSave(FileLocation movie, Progress progress = {});
+    explicit SafeMovieSave(FileLocation movie, Progress progress = {}); ///< does not touch the movie
 
     /// What `repair` would do. Changes nothing, and needs no right to.
     RepairPlan plan() const;

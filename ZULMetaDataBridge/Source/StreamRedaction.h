@@ -26,12 +26,12 @@ inline constexpr const char* s_hiddenText = "\xe2\x80\xa6";
 /// A part of the recording.
 struct TimeRange {
     double from = 0; ///< seconds; both ends belong to it
-    double to = 0;
+    double to = 0;   ///< seconds
 };
 
 /// What a copy must lack.
 struct Redaction {
-    std::set<uuid> removedKinds;
+    std::set<uuid> removedKinds; ///< streams of these are left out as a whole
 
     /// Every keystroke becomes character code 0 without modifier flags, which tell something of the text, too. Their
     /// times stay.
@@ -54,12 +54,12 @@ struct RedactedStream {
         Headless,    ///< too short for a stream's header
     };
 
-    MetaDataHeader header;
-    Removal removal = None;
-    std::uint64_t entries = 0; ///< in the copy
-    std::uint64_t entriesRemoved = 0;
-    std::uint64_t entriesChanged = 0;
-    std::uint64_t bytesLeftOut = 0; ///< behind the last entry that could be read, which nobody could check
+    MetaDataHeader header;            ///< of the original; without a kind where it has none
+    Removal removal = None;           ///< `None` for a stream that was copied
+    std::uint64_t entries = 0;        ///< in the copy
+    std::uint64_t entriesRemoved = 0; ///< for their times
+    std::uint64_t entriesChanged = 0; ///< of those in the copy
+    std::uint64_t bytesLeftOut = 0;   ///< behind the last entry that could be read, which nobody could check
 };
 
 /// Appends the copy to `out`, or nothing where the stream is removed. Failures of `out` show in its state alone.

@@ -31,17 +31,17 @@ struct SalvagedStream {
         Bare,        ///< only the stream's own header was found
     };
 
-    MetaDataHeader header;
-    Origin origin = Bare;
-    std::uint64_t offset = 0; ///< of its header in the file
-    std::uint64_t bytes = 0;  ///< header and whole entries
-    std::uint64_t entries = 0;
+    MetaDataHeader header;                      ///< as it stands in the file
+    Origin origin = Bare;                       ///< how it was found
+    std::uint64_t offset = 0;                   ///< of its header in the file
+    std::uint64_t bytes = 0;                    ///< header and whole entries
+    std::uint64_t entries = 0;                  ///< whole ones
     std::optional<std::uint64_t> declaredBytes; ///< by the DATA around it
 
     /// Whether something of what is declared, or of the entry behind the last whole one, is lost.
     bool isCutShort = false;
 
-    std::uint64_t end() const { return offset + bytes; }
+    std::uint64_t end() const { return offset + bytes; } ///< behind the last whole entry, in the file
 };
 
 /// What was found.
@@ -50,7 +50,7 @@ struct SalvageReport {
     static constexpr std::size_t s_maximumStreams = 10000;
 
     std::vector<SalvagedStream> streams; ///< in the order of their kinds, of each kind the best first
-    bool hasMore = false;
+    bool hasMore = false;                ///< whether the search ended early for that
 };
 
 /// A stream counts where its kind is registered, its version is known, the size of its entries is that of its kind,

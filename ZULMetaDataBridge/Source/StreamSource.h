@@ -26,14 +26,14 @@ public:
     /// Bytes of the caller, such as `loadAllData` gives, which must outlive the source. `name` is for messages.
     static StreamSource memory(std::string_view bytes, std::string name);
 
-    const std::string& name() const { return name_; }
+    const std::string& name() const { return name_; } ///< the path of its file, or what `memory` was given
 
     /// The stream's bytes, ready to be read. Throws `std::system_error` where its file cannot be opened.
     struct Bytes {
-        std::uint64_t length = 0;
-        ReadBytes read;
+        std::uint64_t length = 0; ///< of the stream, header included
+        ReadBytes read;           ///< counts from the header on; keeps the file open
     };
-    Bytes open() const { return open_(); }
+    Bytes open() const { return open_(); } ///< independent of those that were opened before
 
 private:
     StreamSource(std::string name, std::function<Bytes()> open) : name_(std::move(name)), open_(std::move(open)) {}

@@ -22,14 +22,14 @@ public:
     /// Stores the location and runs `setup`. Does not touch the file. Gives the parser itself.
     BaseMetaDataParser* initWithMetaDataFile(const FileLocation& file);
 
-    virtual void setup() {}
+    virtual void setup() {} ///< does nothing here
 
     /// The bytes of the file's stream of this type, header included; empty where the file has none, cannot be
     /// opened or is no container.
     std::unique_ptr<std::stringstream> getMetaDataStream(uuid type) const;
 
-    const FileLocation& metaDataFile() const { return metaDataFile_; }
-    void setMetaDataFile(const FileLocation& file) { metaDataFile_ = file; }
+    const FileLocation& metaDataFile() const { return metaDataFile_; }       ///< the last one that was given
+    void setMetaDataFile(const FileLocation& file) { metaDataFile_ = file; } ///< counts from the next `read` on
 
 private:
     FileLocation metaDataFile_;

@@ -20,8 +20,8 @@ namespace ZULMetaData {
 template <class Kind>
 class ZULMETADATA_API KindMetaDataParser : public BaseMetaDataParser {
 public:
-    KindMetaDataParser() = default;
-    explicit KindMetaDataParser(const FileLocation& file) { this->initWithMetaDataFile(file); }
+    KindMetaDataParser() = default; ///< has no file before `initWithMetaDataFile` gives it one
+    explicit KindMetaDataParser(const FileLocation& file) { this->initWithMetaDataFile(file); } ///< opens nothing
 
     /// Reads the file as it is now into a new list, which the parser keeps too; earlier lists stay as they are.
     /// Empty where the file has no such stream. A damaged entry ends the list.
@@ -41,7 +41,7 @@ public:
 protected:
     /// Null before the first `read`.
     const std::shared_ptr<EntryList>& entries() const { return entries_; }
-    void setEntries(std::shared_ptr<EntryList> entries) { entries_ = std::move(entries); }
+    void setEntries(std::shared_ptr<EntryList> entries) { entries_ = std::move(entries); } ///< until the next `read`
 
 private:
     void load(MetaDataObserver<typename Kind::Value>& observer) const {

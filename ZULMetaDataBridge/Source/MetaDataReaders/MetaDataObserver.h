@@ -11,7 +11,7 @@ namespace ZULMetaData {
 template <StreamValue T>
 class ZULMETADATA_API MetaDataObserver : public DataStreamObserver<T> {
 public:
-    std::vector<T> values;
+    std::vector<T> values;     ///< in the order of the stream
     std::vector<double> times; ///< in seconds, one for each value
 
     bool dataRead(double time, const T& value) override {

@@ -33,8 +33,8 @@ public:
     /// still in the buffer are counted though they are lost.
     virtual std::uint64_t entriesWritten() const { return 0; }
 
-    const FileLocation& metaDataFile() const { return metaDataFile_; }
-    void setMetaDataFile(const FileLocation& file) { metaDataFile_ = file; }
+    const FileLocation& metaDataFile() const { return metaDataFile_; }       ///< the last one that was given
+    void setMetaDataFile(const FileLocation& file) { metaDataFile_ = file; } ///< counts from the next `setup` on
 
 private:
     FileLocation metaDataFile_;

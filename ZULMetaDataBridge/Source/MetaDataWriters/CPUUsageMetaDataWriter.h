@@ -9,7 +9,7 @@ class CPUUsageMetaDataWriter final : public ContinuousMetaDataWriter<CPUUsageKin
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
-    void write(float usage, const MediaTime& time) { append(usage, time); }
+    void write(float usage, const MediaTime& time) { append(usage, time); } ///< stored as it is
 };
 
 } // namespace ZULMetaData

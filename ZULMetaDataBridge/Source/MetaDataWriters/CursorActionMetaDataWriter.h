@@ -11,7 +11,7 @@ class CursorActionMetaDataWriter final : public ContinuousMetaDataWriter<CursorA
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
-    void write(std::int32_t action, const MediaTime& time) { append(action, time); }
+    void write(std::int32_t action, const MediaTime& time) { append(action, time); } ///< bits, stored as they are
 };
 
 } // namespace ZULMetaData

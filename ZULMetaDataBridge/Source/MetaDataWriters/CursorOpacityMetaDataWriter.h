@@ -9,6 +9,7 @@ class CursorOpacityMetaDataWriter final : public ContinuousMetaDataWriter<Cursor
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
+    /// Stored as it is, also outside of 0 to 1.
     void write(double opacity, const MediaTime& time) { append(opacity, time); }
 };
 

@@ -11,6 +11,7 @@ class KeyboardActionMetaDataWriter final : public ContinuousMetaDataWriter<Keybo
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
+    /// `eventFlag` has a bit for each modifier that is held down. Both are stored as they are.
     void writeCharacterCode(std::uint32_t characterCode, std::uint32_t eventFlag, const MediaTime& time) {
         append(KeyStroke(characterCode, eventFlag), time);
     }

@@ -24,7 +24,7 @@ enum class StreamWriterRelease { WithWriter, Never };
 template <class Kind, StreamWriterRelease Release = StreamWriterRelease::WithWriter>
 class ZULMETADATA_API KindMetaDataWriter : public BaseMetaDataWriter {
 public:
-    using StreamWriter = MetaDataWriter<typename Kind::Value, int, int>;
+    using StreamWriter = MetaDataWriter<typename Kind::Value, int, int>; ///< what writes the file
 
     KindMetaDataWriter() = default;
     ~KindMetaDataWriter() override { release(); }
@@ -40,8 +40,10 @@ public:
         metaDataWriter_->init(utf8Path(metaDataFile()), Kind::type, Kind::version);
     }
 
+    /// \copydoc ZULMetaData::BaseMetaDataWriter::isHealthy
     bool isHealthy() const override { return metaDataWriter_ && metaDataWriter_->getStream().good(); }
 
+    /// \copydoc ZULMetaData::BaseMetaDataWriter::entriesWritten
     std::uint64_t entriesWritten() const override { return entriesWritten_; }
 
     /// Null before the first `setup`.
@@ -51,6 +53,7 @@ public:
     void setMetaDataWriter(StreamWriter* writer) { metaDataWriter_ = writer; }
 
 protected:
+    /// Without a stream writer the entry is dropped.
     void append(const typename Kind::Value& value, double seconds, bool flush) {
         if (metaDataWriter_)
             metaDataWriter_->write(seconds, value, flush);
@@ -63,6 +66,7 @@ protected:
             ++entriesWritten_;
     }
 
+    /// What is written afterwards is lost.
     void closeStream() {
         if (metaDataWriter_)
             metaDataWriter_->close();
@@ -91,20 +95,25 @@ private:
 template <class Kind>
 class ZULMETADATA_API ContinuousMetaDataWriter : public KindMetaDataWriter<Kind> {
 public:
-    ContinuousMetaDataWriter() = default;
+    ContinuousMetaDataWriter() = default; ///< has no file before `initWithMetaDataFile` gives it one
+
+    /// Creates the file.
     explicit ContinuousMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); }
 
+    /// Creates the file, and goes back to flushing every write.
     void setup() override {
         flushEveryWrite_ = true;
         KindMetaDataWriter<Kind>::setup();
     }
 
-    void finish() { this->closeStream(); }
+    void finish() { this->closeStream(); } ///< closes the file: what is written afterwards is lost
 
+    /// True from the first `setup` on, unless it was set otherwise.
     bool flushEveryWrite() const { return flushEveryWrite_; }
-    void setFlushEveryWrite(bool flush) { flushEveryWrite_ = flush; }
+    void setFlushEveryWrite(bool flush) { flushEveryWrite_ = flush; } ///< until the next `setup`
 
 protected:
+    /// Flushes as `flushEveryWrite` says.
     void append(const typename Kind::Value& value, const MediaTime& time) {
         KindMetaDataWriter<Kind>::append(value, time.seconds(), flushEveryWrite_);
     }
@@ -133,10 +142,10 @@ inline constexpr std::uint32_t s_flushInterval = 15;
 template <class Kind>
 class ZULMETADATA_API CountedMetaDataWriter : public KindMetaDataWriter<Kind> {
 public:
-    CountedMetaDataWriter() = default;
-    explicit CountedMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); }
+    CountedMetaDataWriter() = default; ///< has no file before `initWithMetaDataFile` gives it one
+    explicit CountedMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); } ///< creates the file
 
-    void finish() { this->closeStream(); }
+    void finish() { this->closeStream(); } ///< closes the file: what is written afterwards is lost
 
     /// Asked before an entry is counted. Starts the count anew where it says yes.
     bool shouldFlush() {
@@ -147,13 +156,14 @@ public:
     }
 
 protected:
+    /// Flushes as `shouldFlush` says, and counts.
     void append(const typename Kind::Value& value, const MediaTime& time) {
         KindMetaDataWriter<Kind>::append(value, time.seconds(), shouldFlush());
         ++written_;
     }
 
-    std::uint32_t written() const { return written_; }
-    void setWritten(std::uint32_t count) { written_ = count; }
+    std::uint32_t written() const { return written_; } ///< entries since the last flush, the flushed one included
+    void setWritten(std::uint32_t count) { written_ = count; } ///< 0 makes the next entry a flushed one
 
 private:
     std::uint32_t written_ = 0;
@@ -163,13 +173,14 @@ private:
 template <class Kind, StreamWriterRelease Release>
 class ZULMETADATA_API OneShotMetaDataWriter : public KindMetaDataWriter<Kind, Release> {
 public:
-    OneShotMetaDataWriter() = default;
-    explicit OneShotMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); }
+    OneShotMetaDataWriter() = default; ///< has no file before `initWithMetaDataFile` gives it one
+    explicit OneShotMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); } ///< creates the file
 
-    bool hasWritten() const { return hasWritten_; }
-    void setHasWritten(bool written) { hasWritten_ = written; }
+    bool hasWritten() const { return hasWritten_; }             ///< also where the entry was lost
+    void setHasWritten(bool written) { hasWritten_ = written; } ///< true makes this ignore its entry
 
 protected:
+    /// Asks for the value where none was written yet, and closes the file behind it.
     template <class MakeValue>
     void writeOnce(MakeValue makeValue) {
         if (hasWritten_)

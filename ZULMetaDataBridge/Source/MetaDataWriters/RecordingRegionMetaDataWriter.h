@@ -10,6 +10,7 @@ class RecordingRegionMetaDataWriter final
 public:
     using OneShotMetaDataWriter::OneShotMetaDataWriter;
 
+    /// Only the first call counts. Fractions are cut off: see `truncated`.
     void writeAndFinalize(const ScreenRect& region) {
         writeOnce([&] { return truncated(region); });
     }

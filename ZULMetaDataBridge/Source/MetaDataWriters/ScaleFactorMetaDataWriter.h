@@ -11,6 +11,7 @@ class ScaleFactorMetaDataWriter final : public OneShotMetaDataWriter<ScaleFactor
 public:
     using OneShotMetaDataWriter::OneShotMetaDataWriter;
 
+    /// Only the first call counts.
     void writeAndFinalize(std::int32_t scaleFactor) {
         writeOnce([&] { return scaleFactor; });
     }

@@ -9,6 +9,7 @@ class ScrollActionMetaDataWriter final : public ContinuousMetaDataWriter<ScrollA
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
+    /// Fractions are cut off: see `truncated`.
     void write(const ScreenPoint& delta, const MediaTime& time) { append(truncated(delta), time); }
 };
 

@@ -15,6 +15,7 @@ class ZULMETADATA_API SystemDataMetaDataWriter final
 public:
     using OneShotMetaDataWriter::OneShotMetaDataWriter;
 
+    /// Asks the system what to write. Only the first call counts.
     void write() {
         writeOnce([] { return systemTexts(ProcessInfo::current()); });
     }

@@ -9,6 +9,7 @@ class TopmostWindowMetaDataWriter final : public ContinuousMetaDataWriter<Topmos
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
+    /// Fractions are cut off: see `truncated`.
     void write(const ScreenRect& window, const MediaTime& time) { append(truncated(window), time); }
 };
 
