@@ -32,7 +32,7 @@ struct ZULMETADATA_API ContainerItem {
 
     std::uint64_t payloadOffset() const { return offset + headerSize; } ///< in the file
 
-    /// Where the next item begins, but for a pad byte. Wraps around where the declared size does not fit 64 bits.
+    /// Where the next item begins, but for a pad byte. Means nothing where the size is 0 or overflows.
     std::uint64_t end() const { return offset + size; }
 
     /// Of the payload, 0 where the declared size does not even cover the header.

@@ -50,7 +50,7 @@ struct SalvageReport {
     static constexpr std::size_t s_maximumStreams = 10000;
 
     std::vector<SalvagedStream> streams; ///< in the order of their kinds, of each kind the best first
-    bool hasMore = false;                ///< whether the search ended early for that
+    bool hasMore = false;                ///< whether what may be headers of further streams was passed over
 };
 
 /// A stream counts where its kind is registered, its version is known, the size of its entries is that of its kind,

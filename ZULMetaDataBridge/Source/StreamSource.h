@@ -31,7 +31,7 @@ public:
     /// The stream's bytes, ready to be read. Throws `std::system_error` where its file cannot be opened.
     struct Bytes {
         std::uint64_t length = 0; ///< of the stream, header included
-        ReadBytes read;           ///< counts from the header on; keeps the file open
+        ReadBytes read;           ///< counts from the header on; keeps its file open
     };
     Bytes open() const { return open_(); } ///< independent of those that were opened before
 
