@@ -26,7 +26,7 @@ for room in SharedDependencies ZULMetaData Platform ZULMetaDataBridge; do # thos
 done
 version=$(sed -nE 's/^project\(ZULMetaData VERSION ([0-9.]+).*/\1/p' CMakeLists.txt)
 # The links of the site, seen from the folder of the classes.
-sed 's|href="|&$relpath^../|' Docs/site/links.html >"$build/links.html"
+sed "s|href=\"|&\$relpath^../|" Docs/site/links.html >"$build/links.html"
 sed -e "/{links}/{r $build/links.html" -e 'd}' Docs/site/header.html >"$build/header.html"
 ZULM_HEADERS="${headers[*]}" ZULM_VERSION=$version ZULM_API_FOLDER=$api ZULM_HTML_HEADER=$build/header.html ZULM_ROOT=$PWD \
     doxygen Docs/site/Doxyfile
