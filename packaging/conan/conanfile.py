@@ -4,6 +4,7 @@ import os
 import re
 
 from conan import ConanFile
+from conan.errors import ConanInvalidConfiguration
 from conan.tools.build import check_min_cppstd
 from conan.tools.cmake import CMake, CMakeDeps, CMakeToolchain, cmake_layout
 from conan.tools.files import copy, load, rmdir
@@ -41,6 +42,8 @@ class ZULMetaDataConan(ConanFile):
 
     def validate(self):
         check_min_cppstd(self, 20)
+        if self.settings.os not in ("Linux", "Macos"):
+            raise ConanInvalidConfiguration(f"{self.name} is for Linux and macOS")
 
     def layout(self):
         cmake_layout(self)
@@ -49,6 +52,9 @@ class ZULMetaDataConan(ConanFile):
         if self._needs_codecs:
             self.requires("libpng/[>=1.6 <2]")
             self.requires("libtiff/[>=4.5 <5]")
+
+    def build_requirements(self):
+        self.tool_requires("cmake/[>=3.25]")
 
     def generate(self):
         CMakeDeps(self).generate()
