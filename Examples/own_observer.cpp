@@ -46,7 +46,7 @@ int main(int count, char** arguments) {
     Odometer odometer(2.0);
     try {
         parser->loadDataType<Point>(s_cursorLocationUUID, odometer, -1);
-    } catch (const std::runtime_error& error) { // the last entry is cut short; those in front of it have come
+    } catch (const std::runtime_error& error) { // the last time is cut short; entries in front of it have come
         std::cerr << error.what() << '\n';
     }
     std::cout << odometer.positions() << " positions, " << std::lround(odometer.pixels()) << " pixels\n";
