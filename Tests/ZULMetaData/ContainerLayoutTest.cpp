@@ -88,6 +88,7 @@ TEST(ContainerLayout, EndsBehindAnItemThatNothingCanFollow) {
     EXPECT_EQ(itemsOf(be32(100) + "mdat" + atom("free")).size(), 1U);         // reaches beyond the end
     EXPECT_EQ(itemsOf(be32(1) + "mdat" + be64(0) + atom("free")).size(), 1U); // has no size yet
     EXPECT_EQ(itemsOf(atom("ftyp") + "1234567").size(), 1U);                  // too few bytes for a header
+    EXPECT_EQ(itemsOf(chunk("RIFF") + "1234567", MetaDataParser::Riff).size(), 1U);
     EXPECT_TRUE(itemsOf("").empty());
 }
 

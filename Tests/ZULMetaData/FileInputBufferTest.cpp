@@ -127,6 +127,15 @@ TEST_F(FileInputBuffer, CannotBeToldFromTheBufferOfAFile) {
     }
 }
 
+TEST_F(FileInputBuffer, MovesByASingleByte) {
+    BufferedFile buffered(file("0123456789"));
+    EXPECT_EQ(buffered.stream.get(), '0');
+    buffered.stream.seekg(1, std::ios_base::cur);
+    EXPECT_EQ(buffered.stream.get(), '2');
+    buffered.stream.seekg(-1, std::ios_base::cur);
+    EXPECT_EQ(buffered.stream.get(), '2');
+}
+
 TEST_F(FileInputBuffer, RefusesPositionsThatNoFileHas) {
     BufferedFile buffered(file("0123456789"));
     EXPECT_FALSE(buffered.stream.seekg(-1));

@@ -297,7 +297,16 @@ TEST(RepairPlan, CannotMendAnotherHeaderThatIsCutShort) {
     const std::string movie = media() + interrupted("ZULX", "");
     for (std::size_t length = 38; length < 46; ++length)
         expectUnrepairable(planFor(movie.substr(0, length)), 30, "do not hold an atom's header");
-    expectUnrepairable(planFor(media() + be32(1) + "ZULM" + be32(7)), 30, "do not hold an atom's header");
+    expectUnrepairable(planFor(media() + be32(1) + "ZULM" + be32(7)), 30,
+                       "the last 12 bytes, from offset 30 on, do not hold an atom's header");
+}
+
+TEST(RepairPlan, NamesAnAtomByItsTypeWhereThatIsReadable) {
+    expectUnrepairable(planFor(media() + be32(100) + "a b~"), 30, "the atom 'a b~' at offset 30");
+    expectUnrepairable(planFor(media() + be32(100) + "a\x1f" + "bc"), 30,
+                       "the atom without a readable type at offset 30");
+    expectUnrepairable(planFor(media() + be32(100) + "a\x7f" + "bc"), 30,
+                       "the atom without a readable type at offset 30");
 }
 
 // Movies that are broken ------------------------------------------------------------------------------------------

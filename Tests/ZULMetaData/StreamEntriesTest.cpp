@@ -193,6 +193,13 @@ TEST(DecodeEntry, RefusesACursorImageWhoseSizesDisagree) {
     EXPECT_FALSE(decodeEntry<CursorImage>(cursorEntry(28, 8, data), 100)) << "of a version without fields";
 }
 
+TEST(DecodeEntry, ReadsACursorImageOfTheFirstVersionWithoutADataPart) {
+    const auto decoded = decodeEntry<CursorImage>(cursorEntry(20, 0, ""), 1);
+    ASSERT_TRUE(decoded);
+    EXPECT_EQ(decoded->value.uniqueId, 7U);
+    EXPECT_EQ(decoded->value.imageData, nullptr);
+}
+
 TEST(DecodeEntry, LeavesOutAnImageLargerThanItsRecord) {
     const auto decoded = decodeEntry<CursorImage>(cursorEntry(36, 16, le32(0xffffffff) + raw(4) + raw(5) + "pngs"), 2);
     ASSERT_TRUE(decoded);

@@ -147,6 +147,14 @@ TEST(StreamExtent, FindsNothingBehindTheEndOfMemory) {
     EXPECT_EQ(read(9, bytes), 0U);
 }
 
+TEST(StreamExtent, FindsNothingInMemoryWithoutBytes) {
+    std::istringstream input;
+    const ReadBytes read = readingFrom(input);
+    std::array<char, 8> bytes{};
+    EXPECT_EQ(read(0, bytes), 0U);
+    EXPECT_EQ(read(1, bytes), 0U);
+}
+
 TEST(SizeOfInput, IsThatOfAllBytesWhateverTheState) {
     std::istringstream input("12345678");
     input.seekg(3);
