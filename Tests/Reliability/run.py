@@ -3,6 +3,7 @@
 import argparse
 import concurrent.futures
 import importlib
+import json
 import pathlib
 import subprocess
 import sys
@@ -48,13 +49,23 @@ def execute(name, arguments):
     return name, result, time.monotonic() - started
 
 
-def table(outcomes):
-    lines = ["| test | cases | lost | crashed | time |", "|---|---:|---:|---:|---:|"]
-    for name, result, seconds in outcomes:
-        holds = "" if result.holds() else " **fails**"
-        lines.append(f"| {CHECKS[name]}{holds} | {result.cases:,} | {result.lost:,} | {result.crashed:,} "
-                     f"| {seconds:.0f} s |")
-    return "\n".join(lines)
+def row(name, result, seconds):
+    holds = "" if result.holds() else " **fails**"
+    return f"| {CHECKS[name]}{holds} | {result.cases:,} | {result.lost:,} | {result.crashed:,} | {seconds:.0f} s |"
+
+
+def table(rows):
+    """`rows` by the names of their checks."""
+    head = ["| test | cases | lost | crashed | time |", "|---|---:|---:|---:|---:|"]
+    return "\n".join(head + [rows[name] for name in CHECKS if name in rows])
+
+
+def with_earlier_rows(arguments, rows):
+    """Those of checks that ran before in the same form too: what was run again replaces what it printed then."""
+    file = arguments.build / f"reliability-{arguments.extent}.json"
+    earlier = json.loads(file.read_text(encoding="utf-8")) if file.exists() else {}
+    file.write_text(json.dumps(earlier | rows, indent=1), encoding="utf-8")
+    return earlier | rows
 
 
 def document(text):
@@ -86,10 +97,11 @@ def main():
             for failure in result.failures[:MOST_SHOWN]:
                 print(f"    {failure}", file=sys.stderr)
 
-    text = table([outcomes[name] for name in names])
-    print(text)
+    rows = {name: row(*outcome) for name, outcome in outcomes.items()}
+    print(table(rows))
+    all_rows = with_earlier_rows(arguments, rows)
     if arguments.document:
-        document(f"This is what the last documented run, `{arguments.extent}`, printed.\n\n{text}")
+        document(f"This is what the last `{arguments.extent}` run of each check printed.\n\n{table(all_rows)}")
     return 0 if all(result.holds() for _, result, _ in outcomes.values()) else 1
 
 
