@@ -16,7 +16,7 @@ if __name__ == "__main__":
 
 from check import Context, Result
 from check import run as run_program
-from Checks.io_faults import Case, Outcome, damage_of, says_which_file
+from Checks.io_faults import Case, Outcome, damage_of, says_which_file_and_why
 from faults import TYPE, Fault, files_in, is_crash
 from recordings import atom, demo_streams, extended_atom, shortened
 
@@ -85,7 +85,7 @@ def problem_of(case, got, wanted):
     if got.code == 0:
         is_right = new.keys() == wanted.keys() and all(new[name].startswith(wanted[name]) for name in wanted)
         return "" if is_right else "does not write what it should"
-    if got.code != 1 or "No space left on device" not in got.errors or not says_which_file(case, got.errors, ""):
+    if got.code != 1 or not says_which_file_and_why(case, got.errors.replace("disk/", ""), ""):
         return "does not say which file, and why"
     if case.files.keys() - got.files.keys() or case.changed in new:
         return "leaves a changed input"
