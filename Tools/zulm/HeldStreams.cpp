@@ -121,7 +121,7 @@ void writePart(const std::string& input, std::uint64_t offset, std::uint64_t siz
                bool force) {
     OutputFile file(output, {input}, force);
     std::ifstream from = openInput(input);
-    std::ofstream to = openOutput(file.temporaryPath(), output + ":");
+    std::ofstream to = openOutput(file.temporaryPath(), output);
     Progress progress("writing " + output, size);
     std::vector<char> piece(s_pieceSize);
     from.seekg(static_cast<std::streamoff>(offset));

@@ -78,7 +78,7 @@ const std::string& OutputFile::temporaryPath() const {
 
 void OutputFile::copyFrom(const std::string& source) {
     std::ifstream from = openInput(source);
-    std::ofstream to = openOutput(temporaryPath(), path_ + ":");
+    std::ofstream to = openOutput(temporaryPath(), path_);
     Progress progress("copying " + source, fs::file_size(source));
     std::vector<char> piece(1 << 20);
     while (from.read(piece.data(), static_cast<std::streamsize>(piece.size())), from.gcount() > 0) {
@@ -102,7 +102,7 @@ void OutputFile::commit() {
 void writeWholeFile(const std::string& path, const std::string& contents, const std::vector<std::string>& inputs,
                     bool force) {
     OutputFile file(path, inputs, force);
-    std::ofstream stream = openOutput(file.temporaryPath(), path + ":");
+    std::ofstream stream = openOutput(file.temporaryPath(), path);
     stream.write(contents.data(), static_cast<std::streamsize>(contents.size()));
     stream.close();
     if (!stream)
@@ -118,11 +118,11 @@ std::ifstream openInput(const std::string& path) {
     return file;
 }
 
-std::ofstream openOutput(const std::string& path, const std::string& subject) {
+std::ofstream openOutput(const std::string& path, const std::string& name) {
     std::ofstream file;
     fileOpen(file, path.c_str(), std::ios::binary | std::ios::trunc);
     if (!file.is_open())
-        throw Failure(fmt::format("{} cannot be written: {}", subject, std::strerror(errno)));
+        throw Failure(fmt::format("{}: cannot be written: {}", name, std::strerror(errno)));
     return file;
 }
 

@@ -42,8 +42,8 @@ void writeWholeFile(const std::string& path, const std::string& contents, const 
 /// Throws `Failure`.
 std::ifstream openInput(const std::string& path);
 
-/// Empties a file to write into it. Throws `Failure`, which calls it `subject`: "FILE:" or "FILE: the copy".
-std::ofstream openOutput(const std::string& path, const std::string& subject);
+/// Empties a file to write into it. Throws `Failure`, which calls it `name`.
+std::ofstream openOutput(const std::string& path, const std::string& name);
 
 /// Whether both paths are the same file.
 bool isSameFile(const std::string& left, const std::string& right);

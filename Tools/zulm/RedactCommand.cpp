@@ -156,7 +156,7 @@ ExitCode runRedact(const RedactOptions& options) {
     const Redaction redaction = redactionFor(options);
     OutputFile output(options.output, {input.path()}, options.force);
     RedactedCopy copy(recording, redaction);
-    copy.write(output.temporaryPath());
+    copy.write(output.temporaryPath(), options.output);
     const bool isEmptyStream = recording.parser().getStreamType() == MetaDataParser::RawStream &&
                                copy.streams().front().removal != RedactedStream::None;
     if (isEmptyStream)

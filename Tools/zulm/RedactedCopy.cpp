@@ -54,11 +54,11 @@ void writeBytes(std::ostream& output, const std::array<char, size>& bytes) {
 }
 
 [[noreturn]] void failToWrite(const std::string& name) {
-    throw Failure(fmt::format("{}: the copy cannot be written: {}", name, std::strerror(errno)));
+    throw Failure(fmt::format("{}: cannot be written: {}", name, std::strerror(errno)));
 }
 
 /// How much has been written or skipped. A stream does not call itself failed where it cannot tell, and what is put
-/// behind that would stand in the wrong place. `name` is the input's.
+/// behind that would stand in the wrong place.
 std::uint64_t sizeOf(std::ostream& output, const std::string& name) {
     const auto end = output.tellp();
     if (end < 0)
@@ -67,11 +67,11 @@ std::uint64_t sizeOf(std::ostream& output, const std::string& name) {
 }
 
 /// The file ends where it was written or skipped to.
-void finish(std::ofstream& output, const std::string& path, const std::string& input) {
-    const std::uint64_t end = sizeOf(output, input);
+void finish(std::ofstream& output, const std::string& path, const std::string& name) {
+    const std::uint64_t end = sizeOf(output, name);
     output.close();
     if (!output)
-        failToWrite(input);
+        failToWrite(name);
     std::filesystem::resize_file(path, end);
 }
 
@@ -142,20 +142,21 @@ bool RedactedCopy::isBeforeMedia(std::size_t item) const {
                        [](const auto& next) { return !next.holdsMetaData() && !next.holdsRecordingInfo(); });
 }
 
-void RedactedCopy::write(const std::string& output) {
-    const std::string folder = std::filesystem::path(output).parent_path().string();
+void RedactedCopy::write(const std::string& path, const std::string& name) {
+    name_ = name;
+    const std::string folder = std::filesystem::path(path).parent_path().string();
     const TemporaryFile streams(folder.empty() ? "." : folder, "streams", ".dat");
-    writeStreams(container() == MetaDataParser::RawStream ? output : streams.path());
+    writeStreams(container() == MetaDataParser::RawStream ? path : streams.path());
     if (container() == MetaDataParser::QuickTime)
-        writeMovie(output, streams.path());
+        writeMovie(path, streams.path());
     if (container() == MetaDataParser::Riff)
-        writeRIFF(output, streams.path());
+        writeRIFF(path, streams.path());
 }
 
 void RedactedCopy::writeStreams(const std::string& file) {
-    std::ofstream output = openOutput(file, recording_.name() + ": the copy");
+    std::ofstream output = openOutput(file, name_);
     for (const HeldStream& held : heldStreams(recording_)) {
-        const std::uint64_t begin = sizeOf(output, recording_.name());
+        const std::uint64_t begin = sizeOf(output, name_);
         const StreamSource source = StreamSource::part(recording_.path(), held.offset, held.present);
         RedactedStream stream =
             orUnreadable(recording_.name(), [&] { return redactStream(source.open(), redaction_, output); });
@@ -163,15 +164,15 @@ void RedactedCopy::writeStreams(const std::string& file) {
         stream.header.uuid = held.type;
         streams_.push_back(stream);
         if (stream.removal == RedactedStream::None)
-            parts_.push_back({begin, sizeOf(output, recording_.name()) - begin});
+            parts_.push_back({begin, sizeOf(output, name_) - begin});
     }
-    finish(output, file, recording_.name());
+    finish(output, file, name_);
 }
 
 void RedactedCopy::writeMovie(const std::string& output, const std::string& streamFile) const {
-    std::ofstream file = openOutput(output, recording_.name() + ": the copy");
+    std::ofstream file = openOutput(output, name_);
     writeItems(file);
-    finish(file, output, recording_.name());
+    finish(file, output, name_);
     std::vector<StreamSource> sources;
     for (const Part& part : parts_)
         sources.push_back(StreamSource::part(streamFile, part.offset, part.size));
@@ -179,7 +180,7 @@ void RedactedCopy::writeMovie(const std::string& output, const std::string& stre
         if (!sources.empty())
             SafeMovieSave(output).attach(sources);
     } catch (const SaveError& error) {
-        throw Failure(fmt::format("{}: the copy cannot be written: {}", recording_.name(), error.sentence()));
+        throw Failure(fmt::format("{}: {}", name_, error.sentence()));
     }
 }
 
@@ -189,7 +190,7 @@ void RedactedCopy::writeRIFF(const std::string& output, const std::string& strea
         size += detail::s_chunkHeaderSize + padded(part.size);
     if (size > s_most32)
         throw Failure(fmt::format("{}: {} bytes of metadata are more than a chunk can hold", recording_.name(), size));
-    std::ofstream file = openOutput(output, recording_.name() + ": the copy");
+    std::ofstream file = openOutput(output, name_);
     writeItems(file);
     std::ifstream streams = openInput(streamFile);
     Progress progress("writing the metadata", size);
@@ -201,7 +202,7 @@ void RedactedCopy::writeRIFF(const std::string& output, const std::string& strea
                      [&] { copyBytes(readingFrom(streams), streamFile, part.offset, part.size, file, progress); });
         file.seekp(static_cast<std::streamoff>(part.size % 2), std::ios::cur);
     }
-    finish(file, output, recording_.name());
+    finish(file, output, name_);
 }
 
 /// All but the metadata, which leaves unused bytes where its place may not be given up.
@@ -215,12 +216,12 @@ void RedactedCopy::writeItems(std::ostream& output) const {
         else if (isBeforeMedia(i))
             writeBlank(output, item);
         if (container() == MetaDataParser::Riff)
-            output.seekp(static_cast<std::streamoff>(sizeOf(output, recording_.name()) % 2), std::ios::cur);
+            output.seekp(static_cast<std::streamoff>(sizeOf(output, name_) % 2), std::ios::cur);
     }
 }
 
 void RedactedCopy::writeBlank(std::ostream& output, const ContainerItem& item) const {
-    const auto end = static_cast<std::streamoff>(sizeOf(output, recording_.name()) + item.size);
+    const auto end = static_cast<std::streamoff>(sizeOf(output, name_) + item.size);
     if (container() == MetaDataParser::Riff)
         writeBytes(output, detail::chunkHeader(detail::s_junkChunk, static_cast<std::uint32_t>(item.payloadSize())));
     else if (item.size > s_most32)

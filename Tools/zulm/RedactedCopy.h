@@ -17,8 +17,8 @@ public:
     /// Throws `Failure` where the container is damaged, and where metadata outside of its place would stay in the copy.
     RedactedCopy(Recording& recording, const ZULMetaData::Redaction& redaction);
 
-    /// Fills `output`, which has the container's extension. Throws `Failure`.
-    void write(const std::string& output);
+    /// Fills the file at `path`, which has the container's extension; messages call it `name`. Throws `Failure`.
+    void write(const std::string& path, const std::string& name);
 
     /// What became of the streams that readers find, in the order of their identifiers.
     const std::vector<ZULMetaData::RedactedStream>& streams() const { return streams_; }
@@ -50,6 +50,7 @@ private:
     std::vector<ZULMetaData::ContainerItem> items_; ///< at the top level
     std::uint64_t total_ = 0;
     std::uint64_t unreachable_ = 0;
+    std::string name_; ///< of the copy
     std::vector<ZULMetaData::RedactedStream> streams_;
     std::vector<Part> parts_; ///< of those that are left
 };

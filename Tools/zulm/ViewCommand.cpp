@@ -89,7 +89,7 @@ void writeMovie(std::ofstream& stream, const std::string& movie, const std::stri
 
 void writePage(OutputFile& file, const ViewOptions& options, const InputFile& input, const PageParts& page,
                const Json& document) {
-    std::ofstream stream = openOutput(file.temporaryPath(), options.output + ":");
+    std::ofstream stream = openOutput(file.temporaryPath(), options.output);
     const std::string text = scriptText(document);
     const std::size_t end = options.embed ? text.size() - std::strlen("\"}") : text.size(); // behind the address
     write(stream, page.front());
