@@ -39,6 +39,14 @@ TEST(ContainerLayout, LeavesAStreamFailedWhoseSizeCannotBeTold) {
     EXPECT_TRUE(stream.fail());
 }
 
+TEST(ContainerLayout, WalksAStreamWhateverItsState) {
+    std::stringstream stream(atom("moov", atom("mvhd")) + atom("free"));
+    stream.setstate(std::ios_base::eofbit | std::ios_base::failbit);
+    EXPECT_EQ(listTopLevel(stream, MetaDataParser::QuickTime).size(), 2U);
+    stream.setstate(std::ios_base::eofbit | std::ios_base::failbit);
+    EXPECT_EQ(listAtoms(stream, 8, 16, 24).size(), 1U);
+}
+
 TEST(ContainerLayout, TellsTheFormsOfHeadersApart) {
     const auto atoms = itemsOf(atom("ftyp") + be32(5) + "oddl" + be64(16) + extendedAtom("mdat"));
     ASSERT_EQ(atoms.size(), 3U);

@@ -418,6 +418,15 @@ TEST_F(Parser, LetsTheErrorOfATornEntryThrough) {
     EXPECT_THAT(entries.values, ElementsAre(Point(10, 20)));
 }
 
+TEST_F(Parser, HasNothingLeftToReadOnceItIsClosed) {
+    const auto parser = createFor("Recording.mp4", media());
+    parser->getStream().seekg(4);
+    EXPECT_EQ(parser->getStream().get(), 'f');
+    parser->close();
+    parser->getStream().clear();
+    EXPECT_EQ(parser->getStream().get(), std::istream::traits_type::eof());
+}
+
 TEST_F(Parser, LoadsNothingOnceItIsClosed) {
     const auto parser = createFor("a.dat", locationStream());
     parser->close();

@@ -99,6 +99,18 @@ TEST(RepairPlan, GivesAnOpenEndedAtomItsSize) {
     EXPECT_EQ(plan.offset, 12U);
 }
 
+TEST(RepairPlan, SaysWhichAtomTakesTheSpareOneIn) {
+    const RepairPlan plan = planForLarge(20 + s_4GiB, atom("ftyp", "mp42") + atom("wide") + be32(0) + "mdat");
+    EXPECT_EQ(plan.finding, "the atom 'mdat' at offset 20 has an open end");
+    EXPECT_EQ(plan.offset, 20U);
+}
+
+TEST(RepairPlan, SaysNothingBeforeItIsMade) {
+    EXPECT_EQ(RepairChange{}.offset, 0U);
+    expectWhole(RepairPlan{});
+    EXPECT_EQ(RepairPlan{}.offset, 0U);
+}
+
 TEST(RepairPlan, KeepsThe32BitSizeUpToItsLastNumber) {
     expectOneChange(planForLarge(12 + std::uint64_t(0xffffffff), atom("ftyp", "mp42") + be32(0) + "mdat"), 12, be32(0),
                     be32(0xffffffff));

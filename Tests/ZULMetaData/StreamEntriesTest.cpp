@@ -50,6 +50,11 @@ TEST(StreamEntries, TellsWhereAnEntryIs) {
     EXPECT_EQ(second->end(), 56U);
 }
 
+TEST(StreamEntries, HaveNeitherPlaceNorSizeOfTheirOwn) {
+    EXPECT_EQ(StreamEntry{}.offset, 0U);
+    EXPECT_EQ(StreamEntry{}.end(), 0U);
+}
+
 TEST(StreamEntries, StopsInFrontOfWhatIsCutShortAtEveryByte) {
     for (const std::string& stream : {locationStream(), appNameStream()}) {
         for (std::size_t length = s_metaDataHeaderSize; length < stream.size(); ++length) {
@@ -167,6 +172,7 @@ TEST(DecodeEntry, RefusesAListWhoseSizeDisagreesWithItsBytes) {
     for (std::size_t length = 0; length < entry.size(); ++length)
         EXPECT_FALSE(decodeEntry<std::list<std::string>>(entry.substr(0, length), 1)) << length;
     EXPECT_FALSE(decodeEntry<std::list<std::string>>(entry + "x", 1));
+    EXPECT_FALSE(decodeEntry<std::list<std::string>>(le32(99) + entry.substr(4), 1));
 }
 
 std::string cursorEntry(std::uint32_t entrySize, std::uint32_t dataSize, const std::string& data) {
