@@ -20,7 +20,7 @@ TEST(ToolRun, TellsOutputFromErrorsAndGivesTheExitCode) {
 TEST(ToolRun, CountsASignalFrom128) {
     EXPECT_EQ(shell("kill -TERM $$").exitCode, 128 + 15);
     ToolOptions options;
-    options.killAfterMilliseconds = 50;
+    options.killAfterMilliseconds = 500;
     options.killSignal = 2;
     EXPECT_EQ(shell("exec sleep 60", options).exitCode, 128 + 2);
 }
