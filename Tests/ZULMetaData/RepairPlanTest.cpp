@@ -311,6 +311,7 @@ TEST(RepairPlan, CannotMendAnotherHeaderThatIsCutShort) {
         expectUnrepairable(planFor(movie.substr(0, length)), 30, "do not hold an atom's header");
     expectUnrepairable(planFor(media() + be32(1) + "ZULM" + be32(7)), 30,
                        "the last 12 bytes, from offset 30 on, do not hold an atom's header");
+    expectUnrepairable(planFor(media() + "x"), 30, "the last 1 byte, from offset 30 on, do not hold an atom's header");
 }
 
 TEST(RepairPlan, NamesAnAtomByItsTypeWhereThatIsReadable) {
