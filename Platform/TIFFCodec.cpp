@@ -189,6 +189,11 @@ bool isPlausible(TIFF* tiff, Extent extent, std::size_t encodedSize) {
     return pieceSize > 0 && pieces > 0 && pieceSize <= ratio * encodedSize / pieces;
 }
 
+// Whether the picture is stored with its columns in place of its rows.
+bool isTurned(TIFF* tiff) {
+    return field<std::uint16_t>(tiff, TIFFTAG_ORIENTATION) > ORIENTATION_BOTLEFT;
+}
+
 // What decoding may hold at a time: the pixels, twice where they are turned, a strip or tile of each plane that is
 // shown, and its bytes as they are stored, which libtiff asks for in growing steps until they turn out to be missing.
 std::uint64_t memoryToDecode(TIFF* tiff, Extent extent, std::size_t encodedSize) {
@@ -203,8 +208,8 @@ std::uint64_t memoryToDecode(TIFF* tiff, Extent extent, std::size_t encodedSize)
         stored = std::max<std::uint64_t>(stored, TIFFGetStrileByteCount(tiff, piece));
     }
     const std::uint64_t read = std::min<std::uint64_t>(stored, largestGrowth * encodedSize + firstStep);
-    const std::uint64_t turned = field<std::uint16_t>(tiff, TIFFTAG_ORIENTATION) > ORIENTATION_BOTLEFT ? 2 : 1;
-    return turned * rgbaSize(extent.width, extent.height) + planes * pieceSize + read +
+    const std::uint64_t copies = isTurned(tiff) ? 2 : 1;
+    return copies * rgbaSize(extent.width, extent.height) + planes * pieceSize + read +
            2 * sizeof(std::uint64_t) * pieces;
 }
 
@@ -355,7 +360,9 @@ std::optional<EncodedImageInfo> readTIFFInfo(std::span<const std::uint8_t> encod
     if (!isPlausible(tiff.get(), extent, encoded.size())) {
         return std::nullopt;
     }
-    return EncodedImageInfo{extent.width, extent.height, memoryToDecode(tiff.get(), extent, encoded.size())};
+    const std::uint64_t memory = memoryToDecode(tiff.get(), extent, encoded.size());
+    return isTurned(tiff.get()) ? EncodedImageInfo{extent.height, extent.width, memory}
+                                : EncodedImageInfo{extent.width, extent.height, memory};
 }
 
 std::optional<Image> decodeTIFF(std::span<const std::uint8_t> encoded) {

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <array>
+#include <utility>
 
 namespace ZULMetaData {
 
@@ -19,6 +20,7 @@ enum Tag : std::uint16_t {
     BitsPerSample = 258,
     Compression = 259,
     StripOffsets = 273,
+    Orientation = 274,
     SamplesPerPixel = 277,
     RowsPerStrip = 278,
     StripSizes = 279,
@@ -157,6 +159,13 @@ std::optional<Layout> layoutOf(const Directory& directory) {
     return isImageSizeAllowed(layout.width, layout.height) ? std::optional(layout) : std::nullopt;
 }
 
+/// Of the picture as it is shown: four of the eight orientations store its columns in place of its rows.
+std::pair<std::uint32_t, std::uint32_t> uprightSize(const Directory& directory, const Layout& layout) {
+    const std::uint64_t orientation = directory.number(Orientation, 0, 1).value_or(1);
+    const bool isTurned = orientation >= 5 && orientation <= 8;
+    return isTurned ? std::pair(layout.height, layout.width) : std::pair(layout.width, layout.height);
+}
+
 bool isPlausible(const Layout& layout, std::size_t encodedSize) {
     return layout.rowSize <= maximumRatio(layout.compression) * encodedSize / layout.height;
 }
@@ -194,7 +203,8 @@ std::optional<EncodedImageInfo> readTIFFInfo(Bytes encoded) {
     const auto layout = directory ? layoutOf(*directory) : std::nullopt;
     if (!layout || !isPlausible(*layout, encoded.size()))
         return std::nullopt;
-    return EncodedImageInfo{layout->width, layout->height, memoryToDecode(*directory, *layout, encoded.size())};
+    const auto [width, height] = uprightSize(*directory, *layout);
+    return EncodedImageInfo{width, height, memoryToDecode(*directory, *layout, encoded.size())};
 }
 
 std::optional<Image> decodeTIFF(Bytes encoded) {
@@ -202,7 +212,8 @@ std::optional<Image> decodeTIFF(Bytes encoded) {
     const auto layout = directory ? layoutOf(*directory) : std::nullopt;
     if (!layout || !isPlausible(*layout, encoded.size()) || !arePixelsThere(*directory, *layout, encoded.size()))
         return std::nullopt;
-    return Image(layout->width, layout->height, {});
+    const auto [width, height] = uprightSize(*directory, *layout);
+    return Image(width, height, {});
 }
 
 std::vector<std::uint8_t> encodeTIFF(const Image&) {

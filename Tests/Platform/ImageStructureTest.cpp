@@ -41,6 +41,8 @@ TEST(ImageStructure, TellsTheSizeOfTIFFFiles) {
         expectSize(encodedElsewhere("-size 31x17 plasma:fractal " + options, "a.tif"), 31, 17);
     }
     expectSize(encodedElsewhere("-size 31x17 plasma:fractal -compress None", "TIFF64:a.tif"), 31, 17);
+    expectSize(encodedElsewhere("-size 31x17 plasma:fractal -orient RightTop -compress None", "a.tif"), 17, 31);
+    expectSize(encodedElsewhere("-size 31x17 plasma:fractal -orient BottomRight -compress None", "a.tif"), 31, 17);
 }
 
 TEST(ImageStructure, SeesThatAFileIsCutShort) {

@@ -194,6 +194,8 @@ TEST(TIFFDecode, EveryOrientationIsTurnedUpright) {
         auto file = grey(3, 2, 8, {1, 2, 3, 4, 5, 6});
         file.set(TIFFFile::Orientation, {orientation++});
         expectPixels(Image::fromEncodedBytes(file.bytes()), 6 / height, height, opaqueGreys(levels));
+        EXPECT_EQ(Image::infoOfEncodedBytes(file.bytes())->width, 6 / height);
+        EXPECT_EQ(Image::infoOfEncodedBytes(file.bytes())->height, height);
     }
 }
 

@@ -184,7 +184,7 @@ bool ContainerWalk::walkStreamAtom(const Item& atom, Surroundings& around) {
     if (!walked.isTailLeftOut && !endsWithoutItsTail(atom, walked.wholeEnd, around))
         return false;
     add(FindingCode::DroppedTail, nameOf(atom.type), atom.start, "the size counts ",
-        atom.start + atom.size - walked.wholeEnd,
+        atom.size - (walked.wholeEnd - atom.start),
         " bytes of a torn entry that were left out of the stream: whatever follows it in the ZULM cannot be reached");
     around.isReachable = false;
     input_.moveTo(walked.wholeEnd);
