@@ -5,6 +5,7 @@ Usage: Fuzz/seeds.py ZULM FOLDER. The committed corpora are what this makes; wha
 """
 
 import pathlib
+import re
 import struct
 import sys
 import tempfile
@@ -26,7 +27,7 @@ READERS = {
     "string": ["slideTitles", "topmostAppName"],
     "string_list": ["systemData"],
 }
-COMMANDS = 33
+COMMANDS = len(re.findall(r'^    \{"', (SOURCE / "Fuzz/commands.cpp").read_text(encoding="utf-8"), re.M))
 STREAM_BYTES = 200
 IDENTIFIERS = ["2b7b6af1-7a1f-11e2-83d0-0017f200be7f", "00000000-0000-0000-0000-000000000000", "2B7B-", "zz", ""]
 

@@ -88,6 +88,7 @@ def metadata_chunk(streams):
 
 FILE_TYPE = atom(b"ftyp", b"mp42\0\0\0\0isom")
 MEDIA = b"0123456789abcdefghijklm"  # of odd size
+OPEN_MEDIA = struct.pack(">I", 0) + b"mdat" + MEDIA  # which goes on to the end of the file
 RECORDING_INFO = extended_atom(b"ZULR", struct.pack("<q", 1) + b"\0" * 56)
 
 

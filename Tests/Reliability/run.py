@@ -60,8 +60,8 @@ def table(rows):
     return "\n".join(head + [rows[name] for name in CHECKS if name in rows])
 
 
-def with_earlier_rows(arguments, rows):
-    """Those of checks that ran before in the same form too: what was run again replaces what it printed then."""
+def remember(arguments, rows):
+    """Gives the rows of all checks that have run in this form, in this build folder; each as its last run printed it."""
     file = arguments.build / f"reliability-{arguments.extent}.json"
     earlier = json.loads(file.read_text(encoding="utf-8")) if file.exists() else {}
     file.write_text(json.dumps(earlier | rows, indent=1), encoding="utf-8")
@@ -99,7 +99,7 @@ def main():
 
     rows = {name: row(*outcome) for name, outcome in outcomes.items()}
     print(table(rows))
-    all_rows = with_earlier_rows(arguments, rows)
+    all_rows = remember(arguments, rows)
     if arguments.document:
         document(f"This is what the last `{arguments.extent}` run of each check printed.\n\n{table(all_rows)}")
     return 0 if all(result.holds() for _, result, _ in outcomes.values()) else 1

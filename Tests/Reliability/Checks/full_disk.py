@@ -7,7 +7,6 @@ import dataclasses
 import json
 import os
 import pathlib
-import re
 import shutil
 import subprocess
 import sys
@@ -17,12 +16,13 @@ if __name__ == "__main__":
 
 from check import Context, Result
 from check import run as run_program
-from Checks.io_faults import Case, Outcome, damage_of
+from Checks.io_faults import Case, Outcome, damage_of, says_which_file_and_why
 from faults import TYPE, Fault, files_in, is_crash
 from recordings import atom, demo_streams, extended_atom, shortened
 
 DISK = 64 * 1024
 PAGE = 4096
+FULL = "No space left on device"
 ENTRIES = 8
 KINDS = ("cursorLocation", "keyboardAction", "slideTitles", "cursorImage")
 
@@ -81,16 +81,12 @@ def perform(folder, case, program, level):
     return Outcome(ended.returncode, ended.stdout, ended.stderr.decode(errors="replace"), files_in(folder))
 
 
-def says_which_file_and_why(errors):
-    return any(re.match(r"zulm: disk/.*: No space left on device(;|$)", line) for line in errors.splitlines())
-
-
 def problem_of(case, got, wanted):
     new = {name: contents for name, contents in got.files.items() if case.files.get(name) != contents}
     if got.code == 0:
         is_right = new.keys() == wanted.keys() and all(new[name].startswith(wanted[name]) for name in wanted)
         return "" if is_right else "does not write what it should"
-    if got.code != 1 or not says_which_file_and_why(got.errors):
+    if got.code != 1 or not says_which_file_and_why(got.errors, "", ("disk/",), FULL):
         return "does not say which file, and why"
     if case.files.keys() - got.files.keys() or case.changed in new:
         return "leaves a changed input"

@@ -13,6 +13,7 @@ NUMBERS = [0, 1, 2, 3, 4, 5, 6, 7, 8, 15, 16, 17, 23, 24, 2**31 - 1, 2**31, 2**3
 SECONDS = 1     # of the processor: others may keep it busy
 SAMPLE = 6      # in the short form the tool is run on every 6th file, and on all crowds
 MANY = 1 << 20  # bytes of a file of nothing but small items
+DATA_SIZE = {"data": (recordings.HEADER + 20, "<I")}  # of the first entry of cursor images
 FULL_BOX = struct.pack(">I", 0)  # version and flags, in front of an atom's own fields
 
 # FILE is the file, OUT does not matter.
@@ -94,20 +95,10 @@ def cursor_images_of_version_1(kind):
     return kind + struct.pack("<iI", 1, 0) + image + again
 
 
-def version_1_fields(stream):
-    begin, *_ = recordings.entry_ends(stream)
-    return {"entries": (20, "<I"), "entry": (begin, "<I"), "data": (begin + 20, "<I")}
-
-
 def extended_movie(streams):
     media = recordings.extended_atom(b"mdat", recordings.MEDIA)
     return (recordings.extended_atom(b"ftyp", b"mp42") + media + recordings.metadata_atom(streams)
             + recordings.RECORDING_INFO)
-
-
-def open_movie():
-    """Its media was never closed and stands behind a spare atom."""
-    return recordings.FILE_TYPE + recordings.atom(b"wide") + struct.pack(">I", 0) + b"mdat" + recordings.MEDIA
 
 
 def movie_with_duration(streams):
@@ -141,7 +132,7 @@ def cases(streams):
     yield from variants("movie.mp4", plain, movie_fields(plain))
     extended = extended_movie(two)
     yield from variants("extended.mp4", extended, movie_fields(extended))
-    spare = open_movie()
+    spare = recordings.FILE_TYPE + recordings.atom(b"wide") + recordings.OPEN_MEDIA
     yield from variants("spare.mp4", spare, atom_fields(spare, "wide", "mdat"))
     timed = movie_with_duration(two)
     yield from variants("timed.mp4", timed, duration_fields(timed))
@@ -150,7 +141,7 @@ def cases(streams):
     for kind, stream in streams.items():
         yield from variants(f"{kind}.dat", stream, stream_fields(kind, stream))
     old = cursor_images_of_version_1(streams["cursorImage"][:16])
-    yield from variants("cursorImageV1.dat", old, version_1_fields(old))
+    yield from variants("cursorImageV1.dat", old, stream_fields("", old) | DATA_SIZE)
     yield from crowds()
 
 

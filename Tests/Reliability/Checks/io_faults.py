@@ -91,11 +91,10 @@ def without_temporaries(files):
     return {name: contents for name, contents in files.items() if not os.path.basename(name).startswith(".")}
 
 
-def says_which_file_and_why(case, errors, usual):
+def says_which_file_and_why(errors, usual, names, reasons):
     """A line that a run without faults does not have, with a file in front and the reason behind it."""
-    names = [*case.files, *OUTPUTS, "standard output", ".:", "./."]
     lines = [line for line in errors.splitlines() if line not in usual]
-    return any(line.startswith("zulm: " + name) and line.partition("; ")[0].endswith(REASONS)
+    return any(line.startswith("zulm: " + name) and line.partition("; ")[0].endswith(reasons)
                for line in lines for name in names)
 
 
@@ -121,7 +120,8 @@ def problem_of(case, fault, got, usual):
         return "" if is_usual or case.name == "redact" or fault.again else "leaves a temporary file"
     if got.code != 1 and not (got.code == usual.code == 3):
         return "gives another result"
-    if not says_which_file_and_why(case, got.errors, usual.errors):
+    names = (*case.files, *OUTPUTS, "standard output", ".:", "./.")
+    if not says_which_file_and_why(got.errors, usual.errors, names, REASONS):
         return "does not say which file and why"
     if not is_sane(got.errors):
         return "tells a number that cannot be"

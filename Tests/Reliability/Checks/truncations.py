@@ -9,7 +9,6 @@ import recordings
 SMALL = 6 * 1024   # bytes of metadata at most
 LARGE = 64 * 1024
 SAMPLE = 97        # in the short form the tool is run on every 97th length
-OPEN_MEDIA = struct.pack(">I", 0) + b"mdat" + recordings.MEDIA
 
 
 def movies(streams, most):
@@ -18,7 +17,7 @@ def movies(streams, most):
     appended = recordings.metadata_atom(chosen)
     return {
         "whole.mp4": recordings.movie(chosen),
-        "open.mov": recordings.FILE_TYPE + recordings.atom(b"wide") + OPEN_MEDIA,
+        "open.mov": recordings.FILE_TYPE + recordings.atom(b"wide") + recordings.OPEN_MEDIA,
         "interrupted.zcap": recordings.FILE_TYPE + recordings.atom(b"mdat", recordings.MEDIA) + appended[:8]
         + bytes(8) + appended[16:],
     }

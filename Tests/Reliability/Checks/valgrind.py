@@ -38,12 +38,13 @@ def replays(context):
     return [(target, context.source / "Fuzz/corpus" / target.name.removeprefix("fuzz_")) for target in targets]
 
 
-def complaint(name, done):
-    """What memcheck or the program itself complains of; None where both are content."""
+def judge(name, done, cases, has_failed, how):
+    """What memcheck complains of; where it is content, `how` the program failed, if it has."""
     text = done.stderr.decode(errors="replace")
     if done.returncode == ERRORS_FOUND:
-        return f"{name}: " + " / ".join(re.findall(r"^==\d+== (\S.*)", text, re.M)[:6])
-    return None
+        found = " / ".join(re.findall(r"^==\d+== (\S.*)", text, re.M)[:6])
+        return check.Result(cases=cases, crashed=1, failures=[f"{name}: {found}"])
+    return check.Result(cases=cases, failures=[f"{name}: fails under valgrind: {how}"] if has_failed else [])
 
 
 def run_program(program, folder):
@@ -51,25 +52,14 @@ def run_program(program, folder):
     done = check.run([*MEMCHECK, program, "--gtest_brief=1", f"--gtest_filter=-{filter_out}"], timeout=3000, cwd=folder)
     tests = re.search(rb"(\d+) tests? from \d+ test suites? ran", done.stdout)
     failed = re.findall(r"^\[  FAILED  \] (\S+)(?: \(|$)", done.stdout.decode(errors="replace"), re.M)
-    result = check.Result(cases=int(tests[1]) if tests else 0)
-    if reported := complaint(program.name, done):
-        result.crashed += 1
-        result.failures.append(reported)
-    elif done.returncode != 0:
-        what = ", ".join(sorted(set(failed))) or f"ended with {done.returncode}"
-        result.failures.append(f"{program.name}: fails under valgrind: {what}")
-    return result
+    how = ", ".join(sorted(set(failed))) or f"ended with {done.returncode}"
+    return judge(program.name, done, int(tests[1]) if tests else 0, done.returncode != 0, how)
 
 
 def run_replay(target, corpus, folder):
     done = check.run([*MEMCHECK, target, corpus], timeout=3000, cwd=folder)
-    result = check.Result(cases=sum(1 for _ in corpus.iterdir()))
-    if reported := complaint(target.name, done):
-        result.crashed += 1
-        result.failures.append(reported)
-    elif done.returncode != 0:
-        result.failures.append(f"{target.name}: fails under valgrind: it ended with {done.returncode}")
-    return result
+    cases = sum(1 for _ in corpus.iterdir())
+    return judge(target.name, done, cases, done.returncode != 0, f"ended with {done.returncode}")
 
 
 def commands(context):
@@ -79,8 +69,8 @@ def commands(context):
     folder.mkdir()
     (folder / "r.mp4").write_bytes(recordings.movie(streams.values()))
     (folder / "torn.mp4").write_bytes(recordings.movie(streams.values())[:-1500])
-    (folder / "m.mp4").write_bytes(recordings.FILE_TYPE + b"\0\0\0\0mdat" + recordings.MEDIA)
-    (folder / "change.mp4").write_bytes(recordings.FILE_TYPE + b"\0\0\0\0mdat" + recordings.MEDIA)
+    for name in ("m.mp4", "change.mp4"):
+        (folder / name).write_bytes(recordings.FILE_TYPE + recordings.OPEN_MEDIA)
     (folder / "a.dat").write_bytes(streams["cursorLocation"])
     (folder / "page.html").write_bytes(b"<head></head>")
     return folder, [
@@ -98,13 +88,7 @@ def commands(context):
 
 def run_command(zulm, words, folder):
     done = check.run([*MEMCHECK, zulm, *words], timeout=600, cwd=folder)
-    result = check.Result(cases=1)
-    if reported := complaint("zulm " + words[0], done):
-        result.crashed += 1
-        result.failures.append(reported)
-    elif done.returncode < 0:
-        result.failures.append(f"zulm {words[0]} was ended by signal {-done.returncode}")
-    return result
+    return judge("zulm " + words[0], done, 1, done.returncode < 0, f"ended by signal {-done.returncode}")
 
 
 def run(context):
