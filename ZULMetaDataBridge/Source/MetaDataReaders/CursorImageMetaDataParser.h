@@ -14,7 +14,7 @@ public:
 
     /// What the last `read` gave; null before.
     std::shared_ptr<EntryList> cursorImageData() const { return entries(); }
-    void setCursorImageData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< kept instead
+    void setCursorImageData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
 };
 
 } // namespace ZULMetaData

@@ -12,7 +12,7 @@ public:
 
     /// What the last `read` gave; null before.
     std::shared_ptr<EntryList> cursorOpacityData() const { return entries(); }
-    void setCursorOpacityData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< kept instead
+    void setCursorOpacityData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
 };
 
 } // namespace ZULMetaData

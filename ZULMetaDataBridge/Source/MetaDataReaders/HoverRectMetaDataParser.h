@@ -12,7 +12,7 @@ public:
 
     /// What the last `read` gave; null before.
     std::shared_ptr<EntryList> hoverRectData() const { return entries(); }
-    void setHoverRectData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< kept instead
+    void setHoverRectData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
 };
 
 } // namespace ZULMetaData

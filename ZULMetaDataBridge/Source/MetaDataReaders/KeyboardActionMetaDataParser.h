@@ -12,7 +12,7 @@ public:
 
     /// What the last `read` gave; null before.
     std::shared_ptr<EntryList> keyboardActionData() const { return entries(); }
-    void setKeyboardActionData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< kept instead
+    void setKeyboardActionData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
 };
 
 } // namespace ZULMetaData

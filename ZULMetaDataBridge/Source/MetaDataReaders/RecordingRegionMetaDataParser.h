@@ -11,7 +11,7 @@ public:
 
     /// What the last `read` gave; null before.
     std::shared_ptr<EntryList> recordingRegionData() const { return entries(); }
-    void setRecordingRegionData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< kept instead
+    void setRecordingRegionData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
 };
 
 } // namespace ZULMetaData

@@ -11,7 +11,7 @@ public:
 
     /// What the last `read` gave; null before.
     std::shared_ptr<EntryList> scaleFactorData() const { return entries(); }
-    void setScaleFactorData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< kept instead
+    void setScaleFactorData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
 };
 
 } // namespace ZULMetaData

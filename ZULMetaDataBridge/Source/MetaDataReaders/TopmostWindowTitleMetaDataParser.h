@@ -11,7 +11,7 @@ public:
 
     /// What the last `read` gave; null before.
     std::shared_ptr<EntryList> windowTitleData() const { return entries(); }
-    void setWindowTitleData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< kept instead
+    void setWindowTitleData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
 };
 
 } // namespace ZULMetaData
