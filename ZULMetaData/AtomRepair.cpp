@@ -10,7 +10,7 @@ namespace ZULMetaData {
 
 namespace {
 
-struct Atom {
+struct AtomHeader {
     std::uint64_t start = 0;
     std::uint64_t size = 0;
     std::uint32_t type = 0;
@@ -28,7 +28,7 @@ bool overwrite(std::fstream& movie, std::uint64_t position, std::span<const char
 }
 
 /// Only the 32-bit size 1 announces an extended one here, unlike in the scan.
-bool readAtom(detail::PositionedInput& input, Atom& atom) {
+bool readHeader(detail::PositionedInput& input, AtomHeader& atom) {
     std::uint32_t shortSize = 0;
     atom.start = input.position();
     if (!input.enoughBytesLeft(detail::s_atomHeaderSize) || !input.readBigEndian(shortSize) ||
@@ -40,7 +40,7 @@ bool readAtom(detail::PositionedInput& input, Atom& atom) {
 }
 
 /// `last` reaches to the end of the movie, `remaining` bytes on, and `previous` stands in front of it.
-bool closeOpenAtom(std::fstream& movie, const Atom& last, const Atom& previous, std::uint64_t remaining) {
+bool closeOpenAtom(std::fstream& movie, const AtomHeader& last, const AtomHeader& previous, std::uint64_t remaining) {
     if (last.isExtended) // what an interrupted append leaves behind
         return overwrite(movie, last.start + detail::s_extendedSizeOffset, detail::bigEndianBytes(remaining));
     if (remaining <= 0xffffffff)
@@ -60,10 +60,10 @@ bool Util::finalizeAtomsInFile(const std::string& path) {
         return false;
     const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(movie));
     detail::PositionedInput input(movie, 0, total);
-    Atom previous;
+    AtomHeader previous;
     while (input.position() < total) {
-        Atom atom;
-        if (!readAtom(input, atom))
+        AtomHeader atom;
+        if (!readHeader(input, atom))
             return false;
         if (atom.size == 0)
             return closeOpenAtom(movie, atom, previous, total - atom.start);

@@ -25,6 +25,8 @@
 extern "C" {
 #endif
 
+/* NOLINTBEGIN(modernize-use-using): C has no other. */
+
 typedef struct ZulmRecording ZulmRecording;
 typedef struct ZulmEntries ZulmEntries;
 typedef struct ZulmText ZulmText;
@@ -106,6 +108,8 @@ ZulmText* zulm_dump(ZulmRecording* recording, const char* kinds);
 const char* zulm_text_bytes(const ZulmText* text);
 size_t zulm_text_size(const ZulmText* text);
 void zulm_free_text(ZulmText* text);
+
+/* NOLINTEND(modernize-use-using) */
 
 #ifdef __cplusplus
 }

@@ -15,7 +15,6 @@ namespace {
 
 constexpr std::uint32_t s_width = 320;
 constexpr std::uint32_t s_height = 180;
-constexpr std::uint32_t s_timescale = 600;
 constexpr std::uint32_t s_length = s_timescale * s_duration;
 
 /// As movies store numbers.

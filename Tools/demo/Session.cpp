@@ -9,8 +9,6 @@ namespace ZULMetaData::Demo {
 
 namespace {
 
-constexpr std::int32_t s_timescale = 600;
-
 const ScreenRect s_region(160, 90, 1280, 720);
 
 using Values = std::initializer_list<std::pair<std::string, EntryValue>>;
@@ -32,6 +30,7 @@ MediaTime at(double seconds) {
 /// The session's times, `rate` to a second.
 std::vector<MediaTime> every(int rate) {
     std::vector<MediaTime> times;
+    times.reserve(static_cast<std::size_t>(rate) * s_duration);
     for (int i = 0; i < rate * s_duration; ++i)
         times.push_back(at(static_cast<double>(i) / rate));
     return times;
@@ -166,6 +165,7 @@ Track recordTexts(const std::string& kind, const std::string& key, const std::ve
 
 std::vector<TimedText> sceneTexts(const char* Scene::*text) {
     std::vector<TimedText> texts;
+    texts.reserve(s_scenes.size());
     for (const Scene& scene : s_scenes)
         texts.push_back({scene.from, scene.*text});
     return texts;

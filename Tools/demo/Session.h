@@ -5,6 +5,7 @@
 
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
+#include <cstdint>
 #include <functional>
 #include <initializer_list>
 #include <memory>
@@ -14,8 +15,8 @@
 
 namespace ZULMetaData::Demo {
 
-/// The session lasts this many seconds.
-inline constexpr int s_duration = 20;
+inline constexpr int s_duration = 20;            ///< of the session, in seconds
+inline constexpr std::int32_t s_timescale = 600; ///< units of a second, in the movie and in the streams
 
 using ExpectedEntry = std::vector<std::pair<std::string, EntryValue>>;
 

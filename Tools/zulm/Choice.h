@@ -30,6 +30,7 @@ template <class Value>
 CLI::Option* addChoice(CLI::App& command, const std::string& name, Value& value, const std::string& description,
                        std::vector<std::pair<std::string, Value>> values) {
     std::vector<std::string> names;
+    names.reserve(values.size());
     for (const auto& choice : values)
         names.push_back(choice.first);
     const auto choose = [&value, values = std::move(values), names, name](const std::string& word) {

@@ -28,7 +28,7 @@ struct DemoOptions {
 std::string makeMovie(const DemoOptions& options) {
     const fs::path source(options.movie);
     const std::string name = "Recording" + (options.movie.empty() ? ".mp4" : source.extension().string());
-    const std::string path = (fs::path(options.folder) / name).string();
+    std::string path = (fs::path(options.folder) / name).string();
     if (options.movie.empty()) {
         writeWholeFile(path, Demo::stillMovie(), {}, options.force);
         return path;

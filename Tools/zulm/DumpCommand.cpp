@@ -58,7 +58,7 @@ public:
             document_->beginStream(stream, keys != nullptr);
     }
 
-    void print(Json entry) {
+    void print(const Json& entry) {
         switch (options_.format) {
         case EntryFormat::Text: return writeOutput(textLine(entry) + '\n');
         case EntryFormat::CSV: return writeOutput(kind_ + ',' + csvLine(entry, *keys_) + '\n');
@@ -108,7 +108,7 @@ public:
             warn(fmt::format("{}: {}, entry {}: {}; not written", recording_.name(), stream_.kind, read_, damage));
         if constexpr (std::same_as<typename Kind::Value, CursorImage>)
             writeImage(entry, value);
-        printout_.print(std::move(entry));
+        printout_.print(entry);
         return true;
     }
 

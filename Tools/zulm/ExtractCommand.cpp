@@ -1,5 +1,6 @@
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
@@ -39,6 +40,7 @@ Json streamDocument(const HeldStream& stream, const std::string& output) {
 
 std::vector<std::string> outputsFor(const std::vector<HeldStream>& streams, const std::string& folder) {
     std::vector<std::string> outputs;
+    outputs.reserve(streams.size());
     for (const HeldStream& stream : streams)
         outputs.push_back(streamFileIn(folder, stream.type));
     return outputs;

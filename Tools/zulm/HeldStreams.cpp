@@ -1,27 +1,21 @@
 #include "Tools/zulm/HeldStreams.h"
 
 #include "Tools/zulm/Choice.h"
-#include "Tools/zulm/OutputFile.h"
-#include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 #include <fmt/ranges.h>
 
 #include <algorithm>
-#include <cerrno>
-#include <cstring>
 #include <filesystem>
-#include <fstream>
 #include <sstream>
+#include <system_error>
 
 namespace Zulm {
 
 using namespace ZULMetaData;
 
 namespace {
-
-constexpr std::size_t s_pieceSize = 1 << 20;
 
 bool isChosen(const uuid& type, const std::vector<std::string>& kinds) {
     return kinds.empty() ||
@@ -37,6 +31,7 @@ bool isIdentifier(const std::string& text) {
 
 std::string checkKind(const std::string& kind) {
     std::vector<std::string> names;
+    names.reserve(s_metaDataKinds.size());
     for (const MetaDataKind& registered : s_metaDataKinds)
         names.emplace_back(registered.name);
     if (isIdentifier(kind) || std::find(names.begin(), names.end(), kind) != names.end())
@@ -115,28 +110,6 @@ void requireFree(const std::vector<std::string>& outputs, bool force) {
     for (const std::string& output : outputs)
         if (!force && std::filesystem::exists(output))
             throw Failure(fmt::format("{}: exists already; --force replaces it", output));
-}
-
-void writePart(const std::string& input, std::uint64_t offset, std::uint64_t size, const std::string& output,
-               bool force) {
-    OutputFile file(output, {input}, force);
-    std::ifstream from = openInput(input);
-    std::ofstream to = openOutput(file.temporaryPath(), output);
-    Progress progress("writing " + output, size);
-    std::vector<char> piece(s_pieceSize);
-    from.seekg(static_cast<std::streamoff>(offset));
-    for (std::uint64_t left = size; left > 0; progress.moveTo(size - left)) {
-        from.read(piece.data(), static_cast<std::streamsize>(std::min<std::uint64_t>(left, piece.size())));
-        requireRead(from, input);
-        if (from.gcount() == 0)
-            throw Failure(fmt::format("{}: ends at offset {}", input, offset + size - left));
-        to.write(piece.data(), from.gcount());
-        left -= static_cast<std::uint64_t>(from.gcount());
-    }
-    to.close();
-    if (!to)
-        throw Failure(fmt::format("{}: cannot be written: {}", output, std::strerror(errno)));
-    file.commit();
 }
 
 } // namespace Zulm

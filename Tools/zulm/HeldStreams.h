@@ -46,8 +46,4 @@ std::string streamFileIn(const std::string& folder, const ZULMetaData::uuid& typ
 /// Throws `Failure` where one of the outputs exists, so that nothing is done by halves.
 void requireFree(const std::vector<std::string>& outputs, bool force);
 
-/// Writes a part of `input` as a whole file. Throws `Failure`.
-void writePart(const std::string& input, std::uint64_t offset, std::uint64_t size, const std::string& output,
-               bool force);
-
 } // namespace Zulm

@@ -3,10 +3,12 @@
 #include "SharedDependencies/EndianFile.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/Progress.h"
+#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/TemporaryFile.h"
 
 #include <fmt/core.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <fcntl.h>
@@ -77,16 +79,25 @@ const std::string& OutputFile::temporaryPath() const {
 }
 
 void OutputFile::copyFrom(const std::string& source) {
+    copyFrom(source, 0, fs::file_size(source));
+}
+
+void OutputFile::copyFrom(const std::string& source, std::uint64_t offset, std::uint64_t size) {
     std::ifstream from = openInput(source);
     std::ofstream to = openOutput(temporaryPath(), path_);
-    Progress progress("copying " + source, fs::file_size(source));
-    std::vector<char> piece(1 << 20);
-    while (from.read(piece.data(), static_cast<std::streamsize>(piece.size())), from.gcount() > 0) {
+    Progress progress("copying " + source, size);
+    std::vector<char> piece(s_copyPieceSize);
+    from.seekg(static_cast<std::streamoff>(offset));
+    for (std::uint64_t left = size; left > 0 && to; progress.moveTo(size - left)) {
+        from.read(piece.data(), static_cast<std::streamsize>(std::min<std::uint64_t>(left, piece.size())));
+        requireRead(from, source);
+        if (from.gcount() == 0)
+            throw Failure(fmt::format("{}: ends at offset {}", source, offset + size - left));
         to.write(piece.data(), from.gcount());
-        progress.advance(static_cast<std::uint64_t>(from.gcount()));
+        left -= static_cast<std::uint64_t>(from.gcount());
     }
     to.close();
-    if (from.bad() || !to)
+    if (!to)
         throw Failure(failureText(path_, "cannot be written"));
 }
 
@@ -107,6 +118,13 @@ void writeWholeFile(const std::string& path, const std::string& contents, const 
     stream.close();
     if (!stream)
         throw Failure(failureText(path, "cannot be written"));
+    file.commit();
+}
+
+void writePart(const std::string& input, std::uint64_t offset, std::uint64_t size, const std::string& output,
+               bool force) {
+    OutputFile file(output, {input}, force);
+    file.copyFrom(input, offset, size);
     file.commit();
 }
 

@@ -2,6 +2,8 @@
 
 // Files that appear whole or not at all.
 
+#include <cstddef>
+#include <cstdint>
 #include <fstream>
 #include <memory>
 #include <string>
@@ -10,6 +12,8 @@
 namespace Zulm {
 
 class TemporaryFile;
+
+constexpr std::size_t s_copyPieceSize = 1 << 20; ///< in bytes: what is copied at once
 
 /// Written beside its place under another name, then synced and renamed. What is not committed is removed, also when
 /// a signal ends the program.
@@ -27,6 +31,9 @@ public:
     /// Fills the file with the bytes of `source`, showing progress. Throws `Failure`.
     void copyFrom(const std::string& source);
 
+    /// Only with `size` bytes from `offset` on. Throws `Failure` also where `source` ends before them.
+    void copyFrom(const std::string& source, std::uint64_t offset, std::uint64_t size);
+
     /// Throws `Failure` where the file cannot be synced or renamed.
     void commit();
 
@@ -38,6 +45,10 @@ private:
 /// Writes `contents` as a whole file. Throws `Failure` as `OutputFile` does.
 void writeWholeFile(const std::string& path, const std::string& contents, const std::vector<std::string>& inputs,
                     bool force);
+
+/// Writes a part of `input` as a whole file. Throws `Failure`.
+void writePart(const std::string& input, std::uint64_t offset, std::uint64_t size, const std::string& output,
+               bool force);
 
 /// Throws `Failure`.
 std::ifstream openInput(const std::string& path);

@@ -85,7 +85,7 @@ bool isLoss(const RedactedStream& stream) {
            (stream.removal != RedactedStream::None && stream.removal != RedactedStream::Asked);
 }
 
-ExitCode complainAboutLoss(const std::string& name, const RedactedCopy& copy) {
+ExitCode complainAboutWhatIsLeftOut(const std::string& name, const RedactedCopy& copy) {
     ExitCode code = ExitFine;
     for (const RedactedStream& stream : copy.streams()) {
         if (!isLoss(stream))
@@ -168,7 +168,7 @@ ExitCode runRedact(const RedactOptions& options) {
         report(options, copy);
     else
         print(options, copy);
-    return worseOf(damage, complainAboutLoss(input.name(), copy));
+    return worseOf(damage, complainAboutWhatIsLeftOut(input.name(), copy));
 }
 
 } // namespace

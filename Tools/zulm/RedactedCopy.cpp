@@ -22,7 +22,6 @@ using namespace ZULMetaData;
 
 namespace {
 
-constexpr std::size_t s_pieceSize = 1 << 20;
 constexpr std::uint64_t s_most32 = std::numeric_limits<std::uint32_t>::max();
 
 /// Of at least one byte. The bytes are compared with themselves, one further on.
@@ -33,7 +32,7 @@ bool isZero(const std::vector<char>& bytes, std::size_t size) {
 /// Appends a part of a file. What is zero is skipped, so that holes stay holes.
 void copyBytes(const ReadBytes& read, const std::string& name, std::uint64_t offset, std::uint64_t size,
                std::ostream& output, Progress& progress) {
-    std::vector<char> piece(s_pieceSize);
+    std::vector<char> piece(s_copyPieceSize);
     for (std::uint64_t left = size; left > 0;) {
         const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(left, piece.size()));
         const std::size_t got = read(offset + size - left, {piece.data(), wanted});

@@ -50,10 +50,10 @@ std::string shown(const std::string& text) {
 }
 
 std::string validText(const std::string& bytes) {
-    using Json = nlohmann::json;
     if (ZULMetaData::isUTF8(bytes))
         return bytes;
-    return Json::parse(Json(bytes).dump(-1, ' ', false, Json::error_handler_t::replace)).get<std::string>();
+    const std::string text = nlohmann::json(bytes).dump(-1, ' ', false, nlohmann::json::error_handler_t::replace);
+    return nlohmann::json::parse(text).get<std::string>();
 }
 
 std::string shellWord(const std::string& word) {
