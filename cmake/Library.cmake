@@ -8,13 +8,12 @@ function(zulm_library target name)
   set_target_properties(${target} PROPERTIES
     EXPORT_NAME ${name}
     VERSION ${PROJECT_VERSION}
-    SOVERSION ${ZULMETADATA_ABI_VERSION})
+    SOVERSION ${ZULMETADATA_ABI_VERSION}
+    CXX_VISIBILITY_PRESET hidden
+    VISIBILITY_INLINES_HIDDEN ON)
   get_target_property(type ${target} TYPE)
   if(type STREQUAL "STATIC_LIBRARY")
     target_compile_definitions(${target} PUBLIC ZULMETADATA_STATIC)
-  endif()
-  if(type STREQUAL "STATIC_LIBRARY" OR NOT ZULMETADATA_BUILD_TESTS) # the tests look inside
-    set_target_properties(${target} PROPERTIES CXX_VISIBILITY_PRESET hidden VISIBILITY_INLINES_HIDDEN ON)
   endif()
   # Each symbol says which version it is of, so that two can live in one process.
   if(type STREQUAL "SHARED_LIBRARY" AND CMAKE_SYSTEM_NAME STREQUAL "Linux")

@@ -7,7 +7,8 @@ endif()
 find_program(CLANGXX clang++ REQUIRED)
 find_program(MAKE make REQUIRED)
 find_program(PKG_CONFIG pkg-config REQUIRED)
-mark_as_advanced(CLANGXX MAKE PKG_CONFIG)
+find_program(PYTHON3 python3 REQUIRED)
+mark_as_advanced(CLANGXX MAKE PKG_CONFIG PYTHON3)
 
 set(sources ${CMAKE_CURRENT_LIST_DIR})
 set(folder ${PROJECT_BINARY_DIR}/consumers)
@@ -39,6 +40,8 @@ endif()
 zulm_add_cmake_consumer(find_package_clang_static find_package application
   -DCMAKE_PREFIX_PATH=${static} -DCMAKE_CXX_COMPILER=${CLANGXX} -DCMAKE_CXX_STANDARD=23
   -DEXPECT_TOOLS=${tools} -DEXPECT_VIEWER=$<BOOL:${ZULM_VIEWER}>)
+zulm_add_cmake_consumer(core_without_codecs core_without_codecs player
+  -DCMAKE_PREFIX_PATH=${static} -DCMAKE_CXX_COMPILER=${CMAKE_CXX_COMPILER})
 zulm_add_cmake_consumer(add_subdirectory add_subdirectory player
   -DZULMETADATA_SOURCE=${PROJECT_SOURCE_DIR} -DCMAKE_CXX_COMPILER=${CMAKE_CXX_COMPILER})
 zulm_add_cmake_consumer(fetch_content fetch_content application
@@ -58,6 +61,8 @@ zulm_add_make_consumer(pkg_config ${shared} "")
 zulm_add_make_consumer(pkg_config_static ${static} --static)
 
 set(libraries ${shared}/${CMAKE_INSTALL_LIBDIR})
+add_test(NAME Consumers/bridge_finds_core COMMAND
+  ${PYTHON3} -c "import ctypes, sys; ctypes.CDLL(sys.argv[1])" ${libraries}/libZULMetaDataBridge.so)
 add_test(NAME Consumers/symbols_of_core COMMAND ${CMAKE_COMMAND}
   -DLIBRARY=${libraries}/libZULMetaData.so -DABI_VERSION=${ZULMETADATA_ABI_VERSION}
   "-DSHOWN=MetaDataParser::create;CursorImageSchema::GetDataSteps;fileOpen" "-DHIDDEN=detail::scanAtoms"
@@ -67,10 +72,11 @@ add_test(NAME Consumers/symbols_of_bridge COMMAND ${CMAKE_COMMAND}
   "-DSHOWN=SafeMovieSave::attach;Image::tiffRepresentation;SaveError"
   "-DHIDDEN=decodePNG;MovieTransaction" -P ${sources}/CheckSymbols.cmake)
 
-set_tests_properties(Consumers/find_package Consumers/examples Consumers/pkg_config Consumers/symbols_of_core
-  Consumers/symbols_of_bridge PROPERTIES FIXTURES_REQUIRED shared_package)
-set_tests_properties(Consumers/find_package_clang_static Consumers/pkg_config_static
+set_tests_properties(Consumers/find_package Consumers/examples Consumers/pkg_config Consumers/bridge_finds_core
+  Consumers/symbols_of_core Consumers/symbols_of_bridge PROPERTIES FIXTURES_REQUIRED shared_package)
+set_tests_properties(Consumers/find_package_clang_static Consumers/core_without_codecs Consumers/pkg_config_static
   PROPERTIES FIXTURES_REQUIRED static_package)
 set_property(TEST Consumers/install_static Consumers/install_shared Consumers/find_package
-  Consumers/find_package_clang_static Consumers/add_subdirectory Consumers/fetch_content Consumers/examples
-  Consumers/pkg_config Consumers/pkg_config_static Consumers/symbols_of_core Consumers/symbols_of_bridge PROPERTY LABELS consumers)
+  Consumers/find_package_clang_static Consumers/core_without_codecs Consumers/add_subdirectory Consumers/fetch_content
+  Consumers/bridge_finds_core Consumers/examples Consumers/pkg_config Consumers/pkg_config_static
+  Consumers/symbols_of_core Consumers/symbols_of_bridge PROPERTY LABELS consumers)
