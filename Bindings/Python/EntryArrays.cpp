@@ -1,5 +1,6 @@
 #include "Bindings/Python/EntryArrays.h"
 
+#include "Bindings/Python/PythonTexts.h"
 #include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
@@ -57,14 +58,6 @@ py::dtype entryType() {
     fields.append(py::make_tuple("time", "<f8"));
     addFields<Kind>(fields);
     return py::dtype::from_args(fields);
-}
-
-py::object pythonText(const std::string& bytes) {
-    const std::size_t length = std::min(bytes.find('\0'), bytes.size());
-    PyObject* text = PyUnicode_DecodeUTF8(bytes.data(), static_cast<py::ssize_t>(length), "surrogateescape");
-    if (!text)
-        throw py::error_already_set();
-    return py::reinterpret_steal<py::object>(text);
 }
 
 /// The stored bytes themselves, in memory that the array owns.
@@ -177,7 +170,7 @@ py::array readEntries(const StreamSource& source) {
     const StreamSource::Bytes stream = source.open();
     const std::optional<MetaDataHeader> header = StreamEntries(stream.read, stream.length).header();
     if (!header || !isDecodable(*header))
-        throw py::value_error(source.name() + ": a stream of a version that this library does not know");
+        throwValueError(source.name() + ": a stream of a version that this library does not know");
     py::array array;
     RecordedKinds::visit(header->uuid, [&]<class Kind>() { array = entriesOfKind<Kind>(stream); });
     return array;

@@ -1,6 +1,8 @@
 // zulmetadata._core: what the package in zulmetadata/ is built on. Its types are described in _core.pyi.
 
 #include "Bindings/Python/EntryArrays.h"
+#include "Bindings/Python/FileError.h"
+#include "Bindings/Python/PythonTexts.h"
 #include "Bindings/Python/StreamWriter.h"
 #include "ZULMetaData/MovieDuration.h"
 #include "ZULMetaData/RecordingInfo.h"
@@ -31,12 +33,12 @@ std::unique_ptr<MetaDataParser> openRecording(const FileLocation& file) {
     std::ifstream stream;
     fileOpen(stream, path.c_str(), std::ios_base::binary);
     if (!stream.is_open())
-        throw std::system_error(errno, std::generic_category(), path);
+        throw FileError::ofErrno(file);
     if (MetaDataParser::streamTypeOf(path) == MetaDataParser::Unknown)
-        throw py::value_error(path + ": neither a movie nor a RIFF file nor a stream file, by its name");
+        throwValueError(path + ": neither a movie nor a RIFF file nor a stream file, by its name");
     auto parser = MetaDataParser::create(path);
     if (!parser)
-        throw std::system_error(errno != 0 ? errno : EIO, std::generic_category(), path);
+        throw FileError::ofErrno(file);
     requireReadable(parser->getStream());
     return parser;
 }
@@ -90,9 +92,11 @@ py::bytes bytesOf(const RecordedStream& stream) {
     std::string bytes;
     {
         const py::gil_scoped_release others;
-        const StreamSource::Bytes opened = stream.source().open();
-        bytes.resize(static_cast<std::size_t>(opened.length));
-        bytes.resize(opened.read(0, bytes));
+        naming(stream.file, [&] {
+            const StreamSource::Bytes opened = stream.source().open();
+            bytes.resize(static_cast<std::size_t>(opened.length));
+            bytes.resize(opened.read(0, bytes));
+        });
     }
     return {bytes};
 }
@@ -126,7 +130,7 @@ RepairPlan repair(const FileLocation& movie, bool dryRun) {
 ValidationReport verify(const FileLocation& file) {
     (void)openRecording(file); // tells what is wrong with a file that cannot be opened
     const py::gil_scoped_release others;
-    return validateRecording(file);
+    return naming(file, [&] { return validateRecording(file); });
 }
 
 const char* stateOf(const RepairPlan& plan) {
@@ -145,21 +149,11 @@ const char* reasonOf(const SaveError& error) {
 }
 
 void setSaveError(const py::handle& type, const SaveError& error) {
-    const py::object exception = type(error.what());
-    exception.attr("file") = error.file();
-    exception.attr("sentence") = error.sentence();
+    const py::object exception = type(pathText(error.what()));
+    exception.attr("file") = pathText(error.file());
+    exception.attr("sentence") = pathText(error.sentence());
     exception.attr("reason") = reasonOf(error);
     PyErr_SetObject(type.ptr(), exception.ptr());
-}
-
-void setOSError(const std::system_error& error) {
-    const std::string sentence = error.what();
-    const std::string end = ": " + error.code().message();
-    const bool hasFile = sentence.ends_with(end); // its name stands in front of the system's words
-    const py::object arguments = hasFile ? py::make_tuple(error.code().value(), error.code().message(),
-                                                          sentence.substr(0, sentence.size() - end.size()))
-                                         : py::make_tuple(error.code().value(), sentence);
-    PyErr_SetObject(PyExc_OSError, arguments.ptr());
 }
 
 void addErrors(py::module_& module) {
@@ -170,14 +164,13 @@ void addErrors(py::module_& module) {
         "the movie could not be made what it was.",
         PyExc_RuntimeError, nullptr);
     module.attr("SaveError") = saveError;
+    registerFileErrors();
     py::register_exception_translator([](std::exception_ptr thrown) {
         try {
             if (thrown)
                 std::rethrow_exception(std::move(thrown));
         } catch (const SaveError& error) {
             setSaveError(saveError, error);
-        } catch (const std::system_error& error) {
-            setOSError(error);
         }
     });
 }
@@ -203,20 +196,26 @@ void addReading(py::module_& module) {
             "is_decodable", [](const RecordedStream& stream) { return isDecodable(stream.header); },
             "Whether `read` knows its kind and version.")
         .def(
-            "read", [](const RecordedStream& stream) { return readEntries(stream.source()); },
+            "read",
+            [](const RecordedStream& stream) {
+                return naming(stream.file, [&] { return readEntries(stream.source()); });
+            },
             "Its whole entries, as a NumPy array of records.")
         .def("raw", bytesOf, "Its bytes, header included.");
     py::class_<RecordingFile>(module, "RecordingFile")
-        .def(py::init<const FileLocation&>(), py::arg("path"))
+        .def(py::init([](const FileLocation& file) { return naming(file, [&] { return RecordingFile(file); }); }),
+             py::arg("path"))
         .def_property_readonly("container", &RecordingFile::container)
         .def_property_readonly("duration", &RecordingFile::duration)
         .def_property_readonly("creators", &RecordingFile::creators)
         .def_property_readonly("streams", &RecordingFile::streams);
     py::class_<CreatorAttributes>(module, "Creator",
                                   "Who stamped a movie: the platform's name, a version, the system's version.")
-        .def_property_readonly("name", &CreatorAttributes::name)
-        .def_property_readonly("version", &CreatorAttributes::version)
-        .def_property_readonly("platform_version", &CreatorAttributes::platformVersion);
+        .def_property_readonly("name", [](const CreatorAttributes& creator) { return pythonText(creator.name()); })
+        .def_property_readonly("version",
+                               [](const CreatorAttributes& creator) { return pythonText(creator.version()); })
+        .def_property_readonly("platform_version",
+                               [](const CreatorAttributes& creator) { return pythonText(creator.platformVersion()); });
     module.def(
         "dtype_of", [](const std::string& kind) { return typeOfEntries(kindNamed(kind).type); }, py::arg("kind"),
         "The fields of an entry of this kind. `KeyError` for a kind without entries of its own.");
@@ -267,7 +266,8 @@ void addSaving(py::module_& module) {
         .def_readonly("offset", &RepairPlan::offset, "Of the atom that is wrong.")
         .def_readonly("has_loss", &RepairPlan::hasLoss, "Part of an interrupted append never got into the movie.");
     py::class_<AttachedStream>(module, "AttachedStream", "What became of one stream that was attached.")
-        .def_readonly("name", &AttachedStream::name, "Of its source.")
+        .def_property_readonly(
+            "name", [](const AttachedStream& stream) { return pathText(stream.name); }, "The path of its source.")
         .def_property_readonly("kind", [](const AttachedStream& stream) { return metaDataKindName(stream.type); })
         .def_readonly("offset", &AttachedStream::offset, "Of its header in the movie.")
         .def_readonly("bytes", &AttachedStream::bytes, "Header and whole entries.")

@@ -1,5 +1,7 @@
 #include "Bindings/Python/StreamWriter.h"
 
+#include "Bindings/Python/FileError.h"
+#include "Bindings/Python/PythonTexts.h"
 #include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
@@ -9,32 +11,12 @@
 #include <cstring>
 #include <limits>
 #include <string_view>
-#include <system_error>
 #include <utility>
 #include <vector>
 
 namespace ZULMetaData::Python {
 
 namespace {
-
-[[noreturn]] void throwOSError(const FileLocation& file) {
-    throw std::system_error(errno != 0 ? errno : EIO, std::generic_category(), utf8Path(file));
-}
-
-/// A text, or bytes that need not be one.
-std::string storedText(const py::handle& value) {
-    std::string bytes;
-    if (py::isinstance<py::bytes>(value)) {
-        bytes = value.cast<std::string>();
-    } else {
-        if (!py::isinstance<py::str>(value))
-            throw py::type_error("a text is a str, or bytes");
-        bytes = py::bytes(value.attr("encode")("utf-8", "surrogateescape")).cast<std::string>();
-    }
-    if (bytes.find('\0') != std::string::npos)
-        throw py::value_error("readers would cut this text off at its zero character");
-    return bytes;
-}
 
 std::string storedValue(const py::tuple& entry, const std::string*) {
     return storedText(entry[1]);
@@ -114,7 +96,7 @@ private:
 
     void throwUnlessHealthy() const {
         if (!stream().good())
-            throwOSError(file_);
+            throw FileError::ofErrno(file_);
     }
 
     void write(const py::array& entries) {

@@ -1,3 +1,5 @@
+import os
+
 import pytest
 import zulmetadata
 from conftest import DATA, PLAIN_MOVIE, sample_entries
@@ -12,6 +14,18 @@ def test_attach_says_what_it_did(tmp_path, plain_movie):
     assert (stream.kind, stream.entries, stream.bytes, stream.bytes_cut) == ("cursorLocation", 2, 56, 4)
     assert attached.repair.state == "whole"
     assert plain_movie.read_bytes().startswith(PLAIN_MOVIE)
+
+
+def test_names_that_are_not_utf8(tmp_path, plain_movie):
+    with pytest.raises(zulmetadata.SaveError, match="cannot be opened") as error:
+        zulmetadata.attach(os.fsdecode(b"no\xffpe.mp4"), [b"\xff.dat"])
+    assert error.value.file == "\udcff.dat"
+    file = tmp_path / os.fsdecode(b"\xff.dat")
+    zulmetadata.write_stream(file, "cpuUsage", [(0, 0.5)])
+    with pytest.raises(zulmetadata.SaveError) as error:
+        zulmetadata.attach(os.fsdecode(b"no\xffpe.mp4"), [file])
+    assert error.value.file == "no\udcffpe.mp4"
+    assert zulmetadata.attach(plain_movie, [file]).streams[0].name == str(file)
 
 
 def test_streams_of_other_recordings(tmp_path, recording):
@@ -45,6 +59,13 @@ def test_stamp(plain_movie):
     (creator,) = zulmetadata.Recording(plain_movie).creators
     assert (creator.name, creator.version) == (stamped.name, stamped.version) == ("Mac", "4.2")
     assert creator.platform_version == stamped.platform_version != ""
+
+
+def test_creators_that_are_no_texts(plain_movie):
+    zulmetadata.stamp(plain_movie, "Recorder", "4.2")
+    plain_movie.write_bytes(plain_movie.read_bytes().replace(b"Mac\0", b"M\xffc\0").replace(b"4.2\0", b"\xfe.2\0"))
+    (creator,) = zulmetadata.Recording(plain_movie).creators
+    assert (creator.name, creator.version) == ("M\udcffc", "\udcfe.2")
 
 
 def test_repair(tmp_path):

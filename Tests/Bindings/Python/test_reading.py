@@ -1,4 +1,5 @@
 import gc
+import os
 import struct
 
 import numpy as np
@@ -83,6 +84,31 @@ def test_what_cannot_be_opened_is_an_os_error(tmp_path):
         assert error.value.filename == str(missing)
         with pytest.raises(ValueError, match="by its name"):
             call(tmp_path)
+
+
+def test_errors_of_a_file_that_vanished_name_it(tmp_path, recording):
+    opened = zulmetadata.Recording(recording)
+    recording.unlink()
+    for call in (lambda: opened["cursorLocation"], lambda: opened.streams[0].raw()):
+        with pytest.raises(FileNotFoundError, match="No such file") as error:
+            call()
+        assert error.value.filename == str(recording)
+
+
+def test_names_that_are_not_utf8(tmp_path):
+    missing = str(tmp_path / os.fsdecode(b"no\xffpe.mp4"))
+    for call in (zulmetadata.Recording, zulmetadata.verify):
+        with pytest.raises(FileNotFoundError) as error:
+            call(missing)
+        assert error.value.filename == missing
+    unknown = tmp_path / os.fsdecode(b"no\xffpe.txt")
+    unknown.touch()
+    with pytest.raises(ValueError, match=r"no\udcffpe.txt: neither"):
+        zulmetadata.Recording(unknown)
+    newer = tmp_path / os.fsdecode(b"\xff.dat")
+    newer.write_bytes(stream(CURSOR_LOCATION, 9, 16))
+    with pytest.raises(ValueError, match=r"\udcff.dat: a stream of a version"):
+        zulmetadata.Recording(newer).streams[0].read()
 
 
 def test_a_file_without_metadata_is_an_empty_recording(plain_movie):
