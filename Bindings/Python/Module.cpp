@@ -157,12 +157,14 @@ void setSaveError(const py::handle& type, const SaveError& error) {
 }
 
 void addErrors(py::module_& module) {
+    using namespace py::literals;
+    const py::dict unknown("file"_a = "", "sentence"_a = "", "reason"_a = "failed"); // of those that Python code makes
     static const py::handle saveError = PyErr_NewExceptionWithDoc(
         "zulmetadata.SaveError",
         "A movie was not changed as it should. `file` and `sentence` say which and why; `reason` is 'failed' where\n"
         "the movie is what it was, 'kind-exists' where it has a stream of that kind already, and 'not-undone' where\n"
         "the movie could not be made what it was.",
-        PyExc_RuntimeError, nullptr);
+        PyExc_RuntimeError, unknown.ptr());
     module.attr("SaveError") = saveError;
     registerFileErrors();
     py::register_exception_translator([](std::exception_ptr thrown) {

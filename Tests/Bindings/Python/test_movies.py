@@ -28,6 +28,11 @@ def test_names_that_are_not_utf8(tmp_path, plain_movie):
     assert zulmetadata.attach(plain_movie, [file]).streams[0].name == str(file)
 
 
+def test_save_errors_of_others_have_the_attributes_too():
+    error = zulmetadata.SaveError("mine")
+    assert (str(error), error.file, error.sentence, error.reason) == ("mine", "", "", "failed")
+
+
 def test_streams_of_other_recordings(tmp_path, recording):
     copy = tmp_path / "Copy.mp4"
     copy.write_bytes(PLAIN_MOVIE)
