@@ -166,6 +166,20 @@ py::dtype typeOfEntries(const uuid& kind) {
     return type;
 }
 
+py::list coordinatesOf(const uuid& kind) {
+    py::list names;
+    RecordedKinds::visit(kind, [&names]<class Kind>() {
+        using Value = typename Kind::Value;
+        const auto add = [&names](const auto&... field) { (names.append(field.key), ...); };
+        if constexpr (std::is_same_v<Value, Point> || std::is_same_v<Value, Rect>)
+            std::apply(add, Kind::fields);
+        else if constexpr (std::is_same_v<Value, CursorImage>)
+            for (const char* name : {"hotspotOffsetX", "hotspotOffsetY"})
+                names.append(name);
+    });
+    return names;
+}
+
 py::array readEntries(const StreamSource& source) {
     const StreamSource::Bytes stream = source.open();
     const std::optional<MetaDataHeader> header = StreamEntries(stream.read, stream.length).header();

@@ -251,6 +251,14 @@ void addWriting(py::module_& module) {
         .def("close", &StreamWriter::close)
         .def_property_readonly("closed", &StreamWriter::isClosed)
         .def_property_readonly("entries_written", &StreamWriter::entriesWritten);
+    module.def(
+        "write_stream",
+        [](const FileLocation& file, const std::string& kind, const py::array& entries) {
+            StreamWriter::writeFile(file, kindNamed(kind), entries);
+        },
+        py::arg("path"), py::arg("kind"), py::arg("entries"));
+    module.def(
+        "coordinates_of", [](const std::string& kind) { return coordinatesOf(kindNamed(kind).type); }, py::arg("kind"));
 }
 
 void addSaving(py::module_& module) {

@@ -55,6 +55,24 @@ CursorImage storedValue(const py::tuple& entry, const CursorImage*) {
             static_cast<CursorImage::CursorImageFlags>(entry[5].cast<std::uint32_t>())};
 }
 
+/// What is ready to be written, for values that are not of a fixed size.
+template <class Value>
+std::vector<TimedValue<Value>> storedEntries(const py::array& entries) {
+    std::vector<TimedValue<Value>> stored;
+    stored.reserve(static_cast<std::size_t>(entries.size()));
+    for (const py::handle entry : entries.attr("tolist")()) {
+        const auto fields = py::reinterpret_borrow<py::tuple>(entry);
+        stored.push_back({fields[0].template cast<double>(), storedValue(fields, static_cast<const Value*>(nullptr))});
+    }
+    return stored;
+}
+
+/// A record is what an entry is.
+template <FixedSizeValue Value>
+const py::array& storedEntries(const py::array& entries) {
+    return entries;
+}
+
 template <class Kind>
 class KindStreamWriter final : public StreamWriter {
 public:
@@ -67,10 +85,16 @@ public:
     void extend(const py::array& entries) override {
         if (isClosed())
             throw py::value_error("the writer is closed");
-        errno = 0;
-        write(entries);
-        throwUnlessHealthy();
+        write(storedEntries<Value>(entries));
         written_ += static_cast<std::uint64_t>(entries.size());
+    }
+
+    /// What `storedEntries` gave.
+    template <class Entries>
+    void write(const Entries& entries) {
+        errno = 0;
+        put(entries);
+        throwUnlessHealthy();
     }
 
     void flush() override {
@@ -99,23 +123,13 @@ private:
             throw FileError::ofErrno(file_);
     }
 
-    void write(const py::array& entries) {
-        if constexpr (FixedSizeValue<Value>) // a record is what an entry is
-            writer_.getStream().write(static_cast<const char*>(entries.data()), entries.nbytes());
-        else
-            for (const TimedValue<Value>& entry : storedEntries(entries))
-                writer_.write(entry.time, entry.value, false);
+    void put(const py::array& records) {
+        writer_.getStream().write(static_cast<const char*>(records.data()), records.nbytes());
     }
 
-    std::vector<TimedValue<Value>> storedEntries(const py::array& entries) const {
-        std::vector<TimedValue<Value>> stored;
-        stored.reserve(static_cast<std::size_t>(entries.size()));
-        for (const py::handle entry : entries.attr("tolist")()) {
-            const auto fields = py::reinterpret_borrow<py::tuple>(entry);
-            stored.push_back(
-                {fields[0].template cast<double>(), storedValue(fields, static_cast<const Value*>(nullptr))});
-        }
-        return stored;
+    void put(const std::vector<TimedValue<Value>>& entries) {
+        for (const TimedValue<Value>& entry : entries)
+            writer_.write(entry.time, entry.value, false);
     }
 
     FileLocation file_;
@@ -129,6 +143,15 @@ std::unique_ptr<StreamWriter> StreamWriter::create(const FileLocation& file, con
     std::unique_ptr<StreamWriter> writer;
     RecordedKinds::visit(kind.type, [&]<class Kind>() { writer = std::make_unique<KindStreamWriter<Kind>>(file); });
     return writer;
+}
+
+void StreamWriter::writeFile(const FileLocation& file, const MetaDataKind& kind, const py::array& entries) {
+    RecordedKinds::visit(kind.type, [&]<class Kind>() {
+        const auto& stored = storedEntries<typename Kind::Value>(entries);
+        KindStreamWriter<Kind> writer(file);
+        writer.write(stored);
+        writer.close();
+    });
 }
 
 } // namespace ZULMetaData::Python

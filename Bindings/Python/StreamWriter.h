@@ -21,6 +21,9 @@ public:
     /// Creates or empties the file. Throws `OSError` where it cannot.
     static std::unique_ptr<StreamWriter> create(const FileLocation& file, const MetaDataKind& kind);
 
+    /// A whole file. Where `entries` do not fit, as for `extend`, nothing has been created or emptied.
+    static void writeFile(const FileLocation& file, const MetaDataKind& kind, const py::array& entries);
+
     StreamWriter() = default;
     StreamWriter(const StreamWriter&) = delete;
     StreamWriter& operator=(const StreamWriter&) = delete;

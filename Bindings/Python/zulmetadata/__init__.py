@@ -13,13 +13,9 @@ an argument a `ValueError`, `TypeError` or `KeyError`; a movie that could not be
 from __future__ import annotations
 
 import os
-import warnings
 from collections.abc import Iterable, Iterator, Mapping
 from types import TracebackType
 from typing import Any, Union
-
-import numpy as np
-import numpy.typing as npt
 
 from . import _core
 from ._core import (
@@ -41,6 +37,9 @@ from ._core import (
     recorded_kinds,
     verify,
 )
+from ._entries import Records as _Records
+from ._entries import Rows as _Rows
+from ._entries import records_of as _records_of
 
 __all__ = [
     "Attached",
@@ -68,27 +67,17 @@ __all__ = [
     "write_stream",
 ]
 
-Path = Union[str, "os.PathLike[str]"]
-Entries = npt.NDArray[Any]
+_Path = Union[str, "os.PathLike[str]"]
 
 
-def _records(entries: npt.ArrayLike, fields: np.dtype[Any]) -> Entries:
-    with warnings.catch_warnings():
-        warnings.simplefilter("error", DeprecationWarning)  # of an integer out of range, which NumPy 2 refuses itself
-        try:
-            return np.ascontiguousarray(entries, fields)
-        except DeprecationWarning as warning:
-            raise OverflowError(str(warning)) from None
-
-
-class Recording(Mapping[str, Entries]):
+class Recording(Mapping[str, _Records]):
     """A movie, RIFF file or stream file: the entries of each stream by the name of its kind.
 
     Entries are read anew each time they are asked for, and are the caller's. Only streams that can be decoded are in
     the mapping; `streams` has all of them.
     """
 
-    def __init__(self, path: Path) -> None:
+    def __init__(self, path: _Path) -> None:
         self._file = _core.RecordingFile(os.fspath(path))
         self._decodable = {stream.kind: stream for stream in self._file.streams if stream.is_decodable}
         self.path = path
@@ -113,7 +102,7 @@ class Recording(Mapping[str, Entries]):
         """Every stream, decodable or not, in the order of their identifiers."""
         return self._file.streams
 
-    def __getitem__(self, kind: str) -> Entries:
+    def __getitem__(self, kind: str) -> _Records:
         return self._decodable[kind].read()
 
     def __contains__(self, kind: object) -> bool:
@@ -137,21 +126,29 @@ class StreamWriter:
 
     The values of an entry are those of `dtype_of(kind)`, behind the time. Entries wait in a buffer until `flush`; what
     the disk does not take is an `OSError`.
+
+    Values are looked at before any of them is written: a number that its field cannot hold, a fraction or not-a-number
+    for an integer, is a `ValueError`, whatever type it comes in. Only coordinates may have fractions, which are cut off,
+    as the library does for applications. A text is a `str`, or `bytes`; anything else is a `TypeError`. An image is
+    `bytes`, or None where an earlier entry with the same identifier has it: hot spot and type are then not stored.
     """
 
-    def __init__(self, path: Path, kind: str) -> None:
-        self._type = dtype_of(kind)
+    def __init__(self, path: _Path, kind: str) -> None:
+        self._fields = dtype_of(kind)
+        self._coordinates = _core.coordinates_of(kind)
         self._file = _core.StreamWriterFile(os.fspath(path), kind)
 
     def append(self, time: float, *values: Any) -> None:
         """Writes one entry."""
-        if self._type.names is None or len(values) != len(self._type.names) - 1:
-            raise TypeError(f"the values of an entry are {', '.join((self._type.names or ())[1:])}")
-        self._file.extend(_records([(time, *values)], self._type))
+        names = self._fields.names or ()
+        if len(values) != len(names) - 1:
+            raise TypeError(f"the values of an entry are {', '.join(names[1:])}")
+        self.extend([(time, *values)])
 
-    def extend(self, entries: npt.ArrayLike) -> None:
-        """Writes many entries: a sequence of tuples, or an array of records, which NumPy converts to the kind's."""
-        self._file.extend(_records(entries, self._type))
+    def extend(self, entries: _Records | _Rows) -> None:
+        """Writes many entries: a sequence of tuples, an array of records whose fields have the names of
+        `dtype_of(kind)`, in any order, or rows of time and values, as an array of two dimensions or a list of lists."""
+        self._file.extend(_records_of(entries, self._fields, self._coordinates))
 
     def flush(self) -> None:
         """Hands what was written to the system."""
@@ -178,13 +175,13 @@ class StreamWriter:
         self.close()
 
 
-def write_stream(path: Path, kind: str, entries: npt.ArrayLike) -> None:
-    """Writes a whole stream file."""
-    with StreamWriter(path, kind) as writer:
-        writer.extend(entries)
+def write_stream(path: _Path, kind: str, entries: _Records | _Rows) -> None:
+    """Writes a whole stream file, of entries as `StreamWriter.extend` takes them. Where they do not fit, a file that was
+    there stays what it was."""
+    _core.write_stream(os.fspath(path), kind, _records_of(entries, dtype_of(kind), _core.coordinates_of(kind)))
 
 
-def attach(movie: Path, streams: Iterable[Path | RecordedStream | Recording], *, replace: bool = False) -> Attached:
+def attach(movie: _Path, streams: Iterable[_Path | RecordedStream | Recording], *, replace: bool = False) -> Attached:
     """Puts streams into a movie: stream files, single streams of other recordings, or all of a recording's.
 
     The movie holds them all afterwards, or is byte for byte what it was and `SaveError` is raised. A kind that is there
@@ -199,11 +196,11 @@ def attach(movie: Path, streams: Iterable[Path | RecordedStream | Recording], *,
     return _core.attach(os.fspath(movie), sources, replace)
 
 
-def stamp(movie: Path, creator: str, version: str) -> Creator:
+def stamp(movie: _Path, creator: str, version: str) -> Creator:
     """Appends who made the movie, and gives what was stored: the platform's name in place of `creator`."""
     return _core.stamp(os.fspath(movie), creator, version)
 
 
-def repair(movie: Path, *, dry_run: bool = False) -> Repair:
+def repair(movie: _Path, *, dry_run: bool = False) -> Repair:
     """Mends a movie's last atom, or an append that was interrupted. With `dry_run` only says what it would do."""
     return _core.repair(os.fspath(movie), dry_run)
