@@ -39,6 +39,35 @@ def test_the_package_is_typed(tmp_path):
     run("mypy", "--strict", str(package), MYPY_CACHE_DIR=str(tmp_path))
 
 
+CONSUMER = """
+import pathlib
+
+import numpy as np
+import zulmetadata
+
+zulmetadata.write_stream("a.dat", "slideTitles", [(0.0, "a")])
+zulmetadata.write_stream(pathlib.Path("a.dat"), "cursorImage", [(0.0, 1, 0, 0, 2, 3, b"image"), (1, 1, 0, 0, 2, 3, None)])
+zulmetadata.write_stream("a.dat", "cursorLocation", [[0.0, 1, 2], [3.0, 4, 5]])
+zulmetadata.write_stream("a.dat", "cursorLocation", np.zeros((2, 3)))
+with zulmetadata.StreamWriter("a.dat", "cursorLocation") as writer:
+    writer.append(0.25, 640, 360)
+    writer.extend(zulmetadata.Recording("a.dat")["cursorLocation"][::2])
+zulmetadata.attach("m.mp4", ["a.dat", pathlib.Path("b.dat"), *zulmetadata.Recording("c.mp4").streams])
+print(zulmetadata.SaveError("x").file.upper(), [finding.code for finding in zulmetadata.verify("m.mp4").findings])
+"""
+
+
+def test_documented_use_is_typed(tmp_path):
+    consumer = tmp_path / "consumer.py"
+    consumer.write_text(CONSUMER)
+    package = pathlib.Path(zulmetadata.__file__).parent.parent
+    run("mypy", "--strict", str(consumer), MYPY_CACHE_DIR=str(tmp_path), MYPYPATH=str(package))
+    consumer.write_text(CONSUMER + 'zulmetadata.write_stream("a.dat", "slideTitles", "a")\nzulmetadata.attach("m.mp4", 5)\n')
+    refused = subprocess.run([sys.executable, "-m", "mypy", "--strict", str(consumer)], capture_output=True, text=True,
+                             env=os.environ | {"MYPY_CACHE_DIR": str(tmp_path), "MYPYPATH": str(package)})
+    assert refused.stdout.count("[arg-type]") == 2 and "Found 2 errors" in refused.stdout
+
+
 def test_heat_map_is_hot_where_the_cursor_was(tmp_path, plain_movie):
     # Ten seconds a quarter of the way into the region, and one second at three quarters.
     cursor = [(t / 10, 480, 270) for t in range(100)] + [(10 + t / 100, 1120, 630) for t in range(100)]
