@@ -118,6 +118,10 @@ class Recording(Mapping[str, _Records]):
         return f"<{self.container} {os.fspath(self.path)!r}: {', '.join(self) or 'no metadata'}>"
 
 
+_SOURCE_TYPES = (str, os.PathLike, RecordedStream, Recording)
+_Source = Union[_Path, RecordedStream, Recording]
+
+
 class StreamWriter:
     """Writes a stream file, entry by entry; close it, or use it in a `with`.
 
@@ -181,14 +185,16 @@ def write_stream(path: _Path, kind: str, entries: _Records | _Rows) -> None:
     _core.write_stream(os.fspath(path), kind, _records_of(entries, dtype_of(kind), _core.coordinates_of(kind)))
 
 
-def attach(movie: _Path, streams: Iterable[_Path | RecordedStream | Recording], *, replace: bool = False) -> Attached:
-    """Puts streams into a movie: stream files, single streams of other recordings, or all of a recording's.
+def attach(movie: _Path, streams: _Source | Iterable[_Source], *, replace: bool = False) -> Attached:
+    """Puts streams into a movie: stream files, single streams of other recordings, or all of a recording's. One of them
+    needs no list around it.
 
     The movie holds them all afterwards, or is byte for byte what it was and `SaveError` is raised. A kind that is there
     already is refused unless `replace` is true. What stands behind the last whole entry of a stream is left out.
     """
+    given = [streams] if isinstance(streams, _SOURCE_TYPES) else streams
     sources: list[str | RecordedStream] = []
-    for stream in streams:
+    for stream in given:
         if isinstance(stream, Recording):
             sources.extend(stream.streams)
         else:

@@ -46,6 +46,17 @@ def test_streams_of_other_recordings(tmp_path, recording):
     assert list(zulmetadata.Recording(single)) == [opened.streams[0].kind]
 
 
+def test_a_single_source_needs_no_list(tmp_path, recording):
+    file = tmp_path / "cpuUsage.dat"
+    opened = zulmetadata.Recording(recording)
+    for number, (source, kinds) in enumerate([(str(file), ["cpuUsage"]), (file, ["cpuUsage"]),
+                                              (opened.streams[2], [opened.streams[2].kind]), (opened, list(opened))]):
+        movie = tmp_path / f"{number}.mp4"
+        movie.write_bytes(PLAIN_MOVIE)
+        zulmetadata.attach(movie, source)
+        assert list(zulmetadata.Recording(movie)) == kinds
+
+
 def test_a_kind_is_replaced_only_when_asked(tmp_path, recording):
     before = recording.read_bytes()
     file = tmp_path / "new.dat"

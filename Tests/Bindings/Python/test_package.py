@@ -53,6 +53,7 @@ with zulmetadata.StreamWriter("a.dat", "cursorLocation") as writer:
     writer.append(0.25, 640, 360)
     writer.extend(zulmetadata.Recording("a.dat")["cursorLocation"][::2])
 zulmetadata.attach("m.mp4", ["a.dat", pathlib.Path("b.dat"), *zulmetadata.Recording("c.mp4").streams])
+zulmetadata.attach("m.mp4", zulmetadata.Recording("c.mp4"))
 print(zulmetadata.SaveError("x").file.upper(), [finding.code for finding in zulmetadata.verify("m.mp4").findings])
 """
 
