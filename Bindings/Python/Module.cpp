@@ -177,21 +177,17 @@ void addErrors(py::module_& module) {
     });
 }
 
-/// A key without a name is the character of its low 8 bits.
-py::str keyText(std::uint32_t code) {
-    const std::string text = HumanReadableActions::KeyboardActionCodeToString(static_cast<std::int32_t>(code));
-    return py::reinterpret_steal<py::str>(
-        PyUnicode_DecodeLatin1(text.data(), static_cast<py::ssize_t>(text.size()), nullptr));
-}
-
 void addReading(py::module_& module) {
     py::class_<RecordedStream>(module, "RecordedStream",
                                "A stream of a recording: where it is, and what it says of itself.")
         .def_property_readonly(
             "kind", [](const RecordedStream& stream) { return metaDataKindName(stream.type); },
             "The name of its kind, or its UUID where that has none.")
-        .def_property_readonly("uuid", [](const RecordedStream& stream) { return uuidText(stream.type); })
-        .def_property_readonly("version", [](const RecordedStream& stream) { return stream.header.version; })
+        .def_property_readonly(
+            "uuid", [](const RecordedStream& stream) { return uuidText(stream.type); },
+            "The identifier of its kind, as text.")
+        .def_property_readonly(
+            "version", [](const RecordedStream& stream) { return stream.header.version; }, "Of its entries.")
         .def_readonly("offset", &RecordedStream::offset, "Of its header in the file.")
         .def_readonly("bytes", &RecordedStream::bytes, "Header included, as the container declares.")
         .def_property_readonly(
@@ -203,7 +199,11 @@ void addReading(py::module_& module) {
                 return naming(stream.file, [&] { return readEntries(stream.source()); });
             },
             "Its whole entries, as a NumPy array of records.")
-        .def("raw", bytesOf, "Its bytes, header included.");
+        .def("raw", bytesOf, "Its bytes, header included.")
+        .def("__repr__", [](const RecordedStream& stream) {
+            return py::str("<RecordedStream {} version={} offset={} bytes={}>")
+                .format(metaDataKindName(stream.type), stream.header.version, stream.offset, stream.bytes);
+        });
     py::class_<RecordingFile>(module, "RecordingFile")
         .def(py::init([](const FileLocation& file) { return naming(file, [&] { return RecordingFile(file); }); }),
              py::arg("path"))
@@ -213,14 +213,35 @@ void addReading(py::module_& module) {
         .def_property_readonly("streams", &RecordingFile::streams);
     py::class_<CreatorAttributes>(module, "Creator",
                                   "Who stamped a movie: the platform's name, a version, the system's version.")
-        .def_property_readonly("name", [](const CreatorAttributes& creator) { return pythonText(creator.name()); })
-        .def_property_readonly("version",
-                               [](const CreatorAttributes& creator) { return pythonText(creator.version()); })
-        .def_property_readonly("platform_version",
-                               [](const CreatorAttributes& creator) { return pythonText(creator.platformVersion()); });
+        .def_property_readonly(
+            "name", [](const CreatorAttributes& creator) { return pythonText(creator.name()); },
+            "The platform's: 'Mac' wherever a movie was recorded.")
+        .def_property_readonly(
+            "version", [](const CreatorAttributes& creator) { return pythonText(creator.version()); },
+            "Of the application that recorded.")
+        .def_property_readonly(
+            "platform_version", [](const CreatorAttributes& creator) { return pythonText(creator.platformVersion()); },
+            "Of the operating system.")
+        .def("__repr__", [](const CreatorAttributes& creator) {
+            return py::str("<Creator {!r} version={!r} platform_version={!r}>")
+                .format(pythonText(creator.name()), pythonText(creator.version()),
+                        pythonText(creator.platformVersion()));
+        });
+}
+
+/// A key without a name is the character of its low 8 bits.
+py::str keyText(std::uint32_t code) {
+    const std::string text = HumanReadableActions::KeyboardActionCodeToString(static_cast<std::int32_t>(code));
+    return py::reinterpret_steal<py::str>(
+        PyUnicode_DecodeLatin1(text.data(), static_cast<py::ssize_t>(text.size()), nullptr));
+}
+
+void addKinds(py::module_& module) {
     module.def(
         "dtype_of", [](const std::string& kind) { return typeOfEntries(kindNamed(kind).type); }, py::arg("kind"),
         "The fields of an entry of this kind. `KeyError` for a kind without entries of its own.");
+    module.def(
+        "coordinates_of", [](const std::string& kind) { return coordinatesOf(kindNamed(kind).type); }, py::arg("kind"));
     module.def(
         "recorded_kinds",
         [] {
@@ -257,35 +278,55 @@ void addWriting(py::module_& module) {
             StreamWriter::writeFile(file, kindNamed(kind), entries);
         },
         py::arg("path"), py::arg("kind"), py::arg("entries"));
-    module.def(
-        "coordinates_of", [](const std::string& kind) { return coordinatesOf(kindNamed(kind).type); }, py::arg("kind"));
 }
 
-void addSaving(py::module_& module) {
+void addRepairing(py::module_& module) {
     py::class_<RepairChange>(module, "RepairChange", "Bytes of a movie that a repair replaces.")
-        .def_readonly("offset", &RepairChange::offset)
-        .def_property_readonly("before", [](const RepairChange& change) { return py::bytes(change.before); })
+        .def_readonly("offset", &RepairChange::offset, "In the movie.")
+        .def_property_readonly(
+            "before", [](const RepairChange& change) { return py::bytes(change.before); }, "What stands there now.")
         .def_property_readonly(
             "after", [](const RepairChange& change) { return py::bytes(change.after); },
             "Empty where the file's last bytes are cut off.")
-        .def_readonly("reason", &RepairChange::reason);
+        .def_readonly("reason", &RepairChange::reason, "One sentence.")
+        .def("__repr__", [](const RepairChange& change) {
+            return py::str("<RepairChange offset={} bytes={}: {}>")
+                .format(change.offset, change.before.size(), change.reason);
+        });
     py::class_<RepairPlan>(module, "Repair", "What is wrong with a movie's atoms, and what mends it.")
         .def_property_readonly("state", stateOf, "'whole', 'repairable' or 'unrepairable'.")
-        .def_readonly("changes", &RepairPlan::changes)
+        .def_readonly("changes", &RepairPlan::changes,
+                      "What mends it, in the order in which it is done; empty where nothing does.")
         .def_readonly("finding", &RepairPlan::finding, "What is wrong, in one sentence; empty where nothing is.")
         .def_readonly("offset", &RepairPlan::offset, "Of the atom that is wrong.")
-        .def_readonly("has_loss", &RepairPlan::hasLoss, "Part of an interrupted append never got into the movie.");
+        .def_readonly("has_loss", &RepairPlan::hasLoss, "Part of an interrupted append never got into the movie.")
+        .def("__repr__", [](const RepairPlan& plan) {
+            return py::str("<Repair {} changes={}>").format(stateOf(plan), plan.changes.size());
+        });
+    module.def("repair", repair, py::arg("movie"), py::arg("dry_run"), py::call_guard<py::gil_scoped_release>());
+}
+
+void addSaving(py::module_& module) {
     py::class_<AttachedStream>(module, "AttachedStream", "What became of one stream that was attached.")
         .def_property_readonly(
             "name", [](const AttachedStream& stream) { return pathText(stream.name); }, "The path of its source.")
-        .def_property_readonly("kind", [](const AttachedStream& stream) { return metaDataKindName(stream.type); })
+        .def_property_readonly(
+            "kind", [](const AttachedStream& stream) { return metaDataKindName(stream.type); },
+            "The name of its kind, or its UUID where that has none.")
         .def_readonly("offset", &AttachedStream::offset, "Of its header in the movie.")
         .def_readonly("bytes", &AttachedStream::bytes, "Header and whole entries.")
-        .def_readonly("entries", &AttachedStream::entries)
-        .def_readonly("bytes_cut", &AttachedStream::bytesCut, "What stood behind its last whole entry.");
+        .def_readonly("entries", &AttachedStream::entries, "That are whole, and in the movie now.")
+        .def_readonly("bytes_cut", &AttachedStream::bytesCut, "What stood behind its last whole entry.")
+        .def("__repr__", [](const AttachedStream& stream) {
+            return py::str("<AttachedStream {} offset={} entries={} bytes_cut={}>")
+                .format(metaDataKindName(stream.type), stream.offset, stream.entries, stream.bytesCut);
+        });
     py::class_<AttachResult>(module, "Attached", "What `attach` did.")
         .def_readonly("repair", &AttachResult::repair, "What was done before.")
-        .def_readonly("streams", &AttachResult::streams);
+        .def_readonly("streams", &AttachResult::streams, "In the order in which they were given.")
+        .def("__repr__", [](const AttachResult& attached) {
+            return py::str("<Attached streams={} repair={}>").format(attached.streams.size(), stateOf(attached.repair));
+        });
     module.def("attach", attach, py::arg("movie"), py::arg("streams"), py::arg("replace"));
     module.def(
         "stamp",
@@ -293,7 +334,6 @@ void addSaving(py::module_& module) {
             return stamp(movie, creator, version).info.creator;
         },
         py::arg("movie"), py::arg("creator"), py::arg("version"), py::call_guard<py::gil_scoped_release>());
-    module.def("repair", repair, py::arg("movie"), py::arg("dry_run"), py::call_guard<py::gil_scoped_release>());
 }
 
 void addVerifying(py::module_& module) {
@@ -306,25 +346,43 @@ void addVerifying(py::module_& module) {
             "Whether something is lost, cannot be reached, or contradicts itself.")
         .def_readonly("place", &Finding::place, "The kind of the stream, or the type of the atom.")
         .def_readonly("offset", &Finding::offset, "In the file.")
-        .def_readonly("sentence", &Finding::sentence)
-        .def("__str__", [](const Finding& finding) {
-            return finding.place + " at offset " + std::to_string(finding.offset) + ": " + finding.sentence;
+        .def_readonly("sentence", &Finding::sentence, "For people, with the numbers in question.")
+        .def("__str__",
+             [](const Finding& finding) {
+                 return finding.place + " at offset " + std::to_string(finding.offset) + ": " + finding.sentence;
+             })
+        .def("__repr__", [](const Finding& finding) {
+            return py::str("<Finding {} {} offset={}: {}>")
+                .format(ruleOf(finding.code).name, finding.place, finding.offset, finding.sentence);
         });
     py::class_<StreamReport>(module, "StreamReport", "What `verify` saw of one stream.")
-        .def_property_readonly("kind", &StreamReport::name)
-        .def_readonly("version", &StreamReport::version)
-        .def_readonly("offset", &StreamReport::offset)
+        .def_property_readonly("kind", &StreamReport::name, "The name of its kind, or its UUID where that has none.")
+        .def_readonly("version", &StreamReport::version, "Of its entries; -1 where its header is cut short.")
+        .def_readonly("offset", &StreamReport::offset, "Of its header in the file.")
         .def_readonly("entries", &StreamReport::wholeEntries, "That are whole and fit their own sizes.")
-        .def_readonly("first_time", &StreamReport::firstTime)
-        .def_readonly("last_time", &StreamReport::lastTime)
-        .def_readonly("is_reachable", &StreamReport::isReachable, "Whether readers find it.");
+        .def_readonly("first_time", &StreamReport::firstTime,
+                      "Seconds, of the first entry with a finite time; None where there is none.")
+        .def_readonly("last_time", &StreamReport::lastTime, "Seconds, of the last entry with a finite time.")
+        .def_readonly("is_reachable", &StreamReport::isReachable, "Whether readers find it.")
+        .def("__repr__", [](const StreamReport& stream) {
+            return py::str("<StreamReport {} offset={} entries={}>")
+                .format(stream.name(), stream.offset, stream.wholeEntries);
+        });
     py::class_<ValidationReport>(module, "Report", "What `verify` says of a file.")
-        .def_readonly("bytes", &ValidationReport::bytes)
-        .def_readonly("streams", &ValidationReport::streams)
-        .def_property_readonly("findings", &ValidationReport::allFindings, "In the order of their offsets.")
-        .def_property_readonly("is_damaged", &ValidationReport::isDamaged)
-        .def_property_readonly("has_metadata", &ValidationReport::hasMetaData);
-    module.def("verify", verify, py::arg("path"));
+        .def_readonly("bytes", &ValidationReport::bytes, "In the file.")
+        .def_readonly("streams", &ValidationReport::streams, "In the order of the file; of very many only the first.")
+        .def_property_readonly("findings", &ValidationReport::allFindings,
+                               "In the order of their offsets; of very many only the first.")
+        .def_property_readonly("is_damaged", &ValidationReport::isDamaged, "Whether any of the findings is damage.")
+        .def_property_readonly("has_metadata", &ValidationReport::hasMetaData,
+                               "Whether there are streams, whole or not.")
+        .def("__repr__", [](const ValidationReport& report) {
+            return py::str("<Report bytes={} streams={} findings={}{}>")
+                .format(report.bytes, report.streamCount, report.damageCount + report.noticeCount,
+                        report.isDamaged() ? ": damaged" : "");
+        });
+    module.def("verify", verify, py::arg("path"),
+               "What is wrong with the metadata of a movie, RIFF file or stream file. Changes nothing.");
 }
 
 } // namespace
@@ -333,7 +391,9 @@ PYBIND11_MODULE(_core, module) {
     module.attr("__version__") = ZULMETADATA_VERSION;
     addErrors(module);
     addReading(module);
+    addKinds(module);
     addWriting(module);
+    addRepairing(module);
     addSaving(module);
     addVerifying(module);
 }

@@ -6,8 +6,9 @@
     cursor = recording["cursorLocation"]        # a NumPy array of records
     print(len(cursor), cursor["time"][0], cursor["x"].max())
 
-A file is read as it was when the `Recording` was made. What goes wrong with a file is an `OSError`, what is wrong with
-an argument a `ValueError`, `TypeError` or `KeyError`; a movie that could not be changed is a `SaveError`.
+A `Recording` looks for the streams of a file once, when it is made; their bytes are read anew each time that entries are
+asked for. Of a file that was changed since, make another one. What goes wrong with a file is an `OSError`, what is wrong
+with an argument a `ValueError`, `TypeError` or `KeyError`; a movie that could not be changed is a `SaveError`.
 """
 
 from __future__ import annotations
@@ -73,8 +74,8 @@ _Path = Union[str, "os.PathLike[str]"]
 class Recording(Mapping[str, _Records]):
     """A movie, RIFF file or stream file: the entries of each stream by the name of its kind.
 
-    Entries are read anew each time they are asked for, and are the caller's. Only streams that can be decoded are in
-    the mapping; `streams` has all of them.
+    Entries are read anew each time they are asked for, from where the stream was when the `Recording` was made, and are
+    the caller's. Only streams that can be decoded are in the mapping; `streams` has all of them.
     """
 
     def __init__(self, path: _Path) -> None:
@@ -140,6 +141,7 @@ class StreamWriter:
     def __init__(self, path: _Path, kind: str) -> None:
         self._fields = dtype_of(kind)
         self._coordinates = _core.coordinates_of(kind)
+        self._name = f"{kind} {os.fspath(path)!r}"
         self._file = _core.StreamWriterFile(os.fspath(path), kind)
 
     def append(self, time: float, *values: Any) -> None:
@@ -164,11 +166,16 @@ class StreamWriter:
 
     @property
     def closed(self) -> bool:
+        """Whether the file was ended."""
         return self._file.closed
 
     @property
     def entries_written(self) -> int:
+        """Since the file was created, in the buffer or out of it."""
         return self._file.entries_written
+
+    def __repr__(self) -> str:
+        return f"<StreamWriter {self._name} entries_written={self.entries_written}{': closed' if self.closed else ''}>"
 
     def __enter__(self) -> StreamWriter:
         return self

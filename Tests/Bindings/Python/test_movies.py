@@ -105,6 +105,36 @@ def test_verify(recording):
     assert codes == {"undecodable-image", "not-utf8"}  # which the sample has on purpose
 
 
+def test_what_is_printed_tells_something(tmp_path, plain_movie):
+    file = tmp_path / "cursorLocation.dat"
+    writer = zulmetadata.StreamWriter(file, "cursorLocation")
+    writer.append(0, 1, 2)
+    assert repr(writer) == f"<StreamWriter cursorLocation '{file}' entries_written=1>"
+    writer.close()
+    assert repr(writer) == f"<StreamWriter cursorLocation '{file}' entries_written=1: closed>"
+    attached = zulmetadata.attach(plain_movie, file)
+    assert repr(attached) == "<Attached streams=1 repair=whole>"
+    assert repr(attached.streams) == "[<AttachedStream cursorLocation offset=48 entries=1 bytes_cut=0>]"
+    stamped = zulmetadata.stamp(plain_movie, "Recorder", "4.2")
+    assert repr(stamped) == f"<Creator 'Mac' version='4.2' platform_version='{stamped.platform_version}'>"
+    assert repr(zulmetadata.Recording(plain_movie).streams) == "[<RecordedStream cursorLocation version=1 offset=48 bytes=40>]"
+    size = plain_movie.stat().st_size
+    report = zulmetadata.verify(plain_movie)
+    assert repr(report) == f"<Report bytes={size} streams=1 findings=0>"
+    assert repr(report.streams) == "[<StreamReport cursorLocation offset=48 entries=1>]"
+
+    file.write_bytes(file.read_bytes() + b"torn")
+    report = zulmetadata.verify(file)
+    (finding,) = report.findings
+    assert repr(report) == "<Report bytes=44 streams=1 findings=1: damaged>"
+    assert repr(finding) == f"<Finding torn-entry cursorLocation offset=40: {finding.sentence}>"
+
+    plain_movie.write_bytes(PLAIN_MOVIE + b"\0\0\0\0mdatpicture")
+    plan = zulmetadata.repair(plain_movie, dry_run=True)
+    assert repr(plan) == "<Repair repairable changes=1>"
+    assert repr(plan.changes) == f"[<RepairChange offset=16 bytes=4: {plan.changes[0].reason}>]"
+
+
 INVALID = dict(line.split("\t", 1) for line in (DATA / "invalid" / "expected.tsv").read_text().splitlines())
 
 

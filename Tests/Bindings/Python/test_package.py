@@ -1,3 +1,4 @@
+import ast
 import os
 import pathlib
 import re
@@ -16,10 +17,35 @@ def test_version_is_the_projects():
     assert zulmetadata.__version__ == re.search(r"project\(ZULMetaData VERSION ([0-9.]+)", text).group(1)
 
 
-def test_everything_public_is_described():
+def described(thing):
+    """Whether there is a text, behind the signature that the core's functions begin with."""
+    text = thing.__doc__ or ""
+    if re.match(r"\w+\(.*\) -> ", text):
+        text = text.partition("\n")[2]
+    return text.strip() != ""
+
+
+def public_things():
     for name in zulmetadata.__all__:
         thing = getattr(zulmetadata, name)
-        assert isinstance(thing, str) or thing.__doc__, name
+        if not isinstance(thing, str):
+            yield name, thing
+        if isinstance(thing, type):
+            yield from ((f"{name}.{member}", getattr(thing, member)) for member in vars(thing)
+                        if not member.startswith("_") and not isinstance(getattr(thing, member), str))
+
+
+def test_everything_public_is_described():
+    things = dict(public_things())
+    assert {"verify", "Recording.container", "RecordedStream.read", "Finding.sentence"} <= things.keys()
+    assert [name for name, thing in things.items() if not described(thing)] == []
+
+
+def test_every_name_that_the_package_makes_is_exported_or_private():
+    names = set()
+    for node in ast.parse(pathlib.Path(zulmetadata.__file__).read_text()).body:
+        names |= {getattr(node, "name", "_"), *(target.id for target in getattr(node, "targets", []))}
+    assert {name for name in names if not name.startswith("_")} <= set(zulmetadata.__all__)
 
 
 def run(module, *arguments, **environment):
