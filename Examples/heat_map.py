@@ -1,6 +1,7 @@
-"""Draws where the cursor was, and for how long, over the recorded region: heat_map.py RECORDING PICTURE"""
+"""Draws where the cursor was, and for how long, over the recorded region, with a circle around each click."""
 
 # %% What was recorded
+import argparse
 import sys
 
 import matplotlib
@@ -10,10 +11,29 @@ import matplotlib.pyplot as plt
 import numpy as np
 import zulmetadata
 
-recording = zulmetadata.Recording(sys.argv[1])
-cursor = recording["cursorLocation"]
-clicks = recording["cursorAction"]
-region = recording["recordingRegion"][-1]
+LEFT_DOWN, RIGHT_DOWN = 1, 4  # the bits that zulmetadata.action_text puts into words
+
+parser = argparse.ArgumentParser(description=__doc__)
+parser.add_argument("recording", metavar="RECORDING")
+parser.add_argument("picture", metavar="PICTURE")
+arguments = parser.parse_args()
+
+try:
+    recording = zulmetadata.Recording(arguments.recording)
+except (OSError, ValueError) as error:
+    sys.exit(str(error))
+
+
+def recorded(kind, least):
+    entries = recording.get(kind)
+    if entries is None or len(entries) < least:
+        sys.exit(f"{arguments.recording}: there is no {kind} in it")
+    return entries
+
+
+cursor = recorded("cursorLocation", least=1)
+clicks = recorded("cursorAction", least=0)
+region = recorded("recordingRegion", least=1)[-1]
 
 # %% How long the cursor stayed at each place: until the next position came
 seconds = np.diff(cursor["time"], append=max(recording.duration or 0, cursor["time"][-1]))
@@ -22,7 +42,7 @@ heat, rows, columns = np.histogram2d(
     cursor["y"], cursor["x"], bins=(18, 32), range=((top, top + height), (left, left + width)), weights=seconds)
 
 # %% Where it was clicked: the last position in front of each click
-pressed = clicks[np.isin(clicks["rawActionValue"] & 0x3F, (1, 4))]
+pressed = clicks[clicks["rawActionValue"] & (LEFT_DOWN | RIGHT_DOWN) != 0]
 nearest = np.searchsorted(cursor["time"], pressed["time"], side="right") - 1
 places = cursor[nearest[nearest >= 0]]
 
@@ -33,5 +53,5 @@ axes.scatter(places["x"], places["y"], s=60, facecolors="none", edgecolors="whit
 axes.set_title(f"{len(cursor)} positions in {cursor['time'][-1]:.0f} s, and {len(places)} clicks")
 axes.set_axis_off()
 figure.colorbar(shown, label="seconds", shrink=0.8)
-figure.savefig(sys.argv[2])
+figure.savefig(arguments.picture)
 print(f"{heat.sum():.1f} s over the region, {len(places)} clicks")

@@ -7,6 +7,7 @@ import sys
 
 import numpy as np
 import zulmetadata
+from conftest import PLAIN_MOVIE, sample_entries
 from matplotlib import image
 
 PROJECT = pathlib.Path(__file__).parents[3]
@@ -95,19 +96,43 @@ def test_documented_use_is_typed(tmp_path):
     assert refused.stdout.count("[arg-type]") == 2 and "Found 2 errors" in refused.stdout
 
 
+def heat_map(*arguments):
+    return subprocess.run([sys.executable, PROJECT / "Examples" / "heat_map.py", *arguments], capture_output=True,
+                          text=True)
+
+
+def test_heat_map_says_what_it_lacks(tmp_path):
+    refused = heat_map()
+    assert refused.returncode == 2 and refused.stderr.startswith("usage: heat_map.py [-h] RECORDING PICTURE\n")
+    refused = heat_map(tmp_path / "missing.mp4", tmp_path / "heat.png")
+    assert refused.returncode == 1 and refused.stderr.startswith("[Errno 2] No such file or directory")
+    movie = tmp_path / "Recording.mp4"
+    for lacking in ("cursorLocation", "cursorAction", "recordingRegion"):
+        movie.write_bytes(PLAIN_MOVIE)
+        for kind in {"cursorLocation", "cursorAction", "recordingRegion"} - {lacking}:
+            zulmetadata.write_stream(tmp_path / "a.dat", kind, sample_entries(kind))
+            zulmetadata.attach(movie, tmp_path / "a.dat")
+        refused = heat_map(movie, tmp_path / "heat.png")
+        assert (refused.returncode, refused.stderr) == (1, f"{movie}: there is no {lacking} in it\n")
+    zulmetadata.write_stream(tmp_path / "a.dat", "recordingRegion", sample_entries("recordingRegion"))
+    zulmetadata.write_stream(tmp_path / "b.dat", "cursorLocation", [])
+    zulmetadata.attach(movie, [tmp_path / "a.dat", tmp_path / "b.dat"], replace=True)
+    refused = heat_map(movie, tmp_path / "heat.png")
+    assert (refused.returncode, refused.stderr) == (1, f"{movie}: there is no cursorLocation in it\n")
+
+
 def test_heat_map_is_hot_where_the_cursor_was(tmp_path, plain_movie):
     # Ten seconds a quarter of the way into the region, and one second at three quarters.
     cursor = [(t / 10, 480, 270) for t in range(100)] + [(10 + t / 100, 1120, 630) for t in range(100)]
-    streams = {"cursorLocation": cursor, "cursorAction": [(10.5, 1), (10.6, 2)],
+    streams = {"cursorLocation": cursor, "cursorAction": [(10.5, 1 + 16), (10.6, 2)],
                "recordingRegion": [(0, 160, 90, 1280, 720)]}
     for kind, entries in streams.items():
         zulmetadata.write_stream(tmp_path / f"{kind}.dat", kind, entries)
     zulmetadata.attach(plain_movie, [tmp_path / f"{kind}.dat" for kind in streams])
 
     picture = tmp_path / "heat.png"
-    drawn = subprocess.run([sys.executable, PROJECT / "Examples" / "heat_map.py", plain_movie, picture],
-                           capture_output=True, text=True, check=True)
-    assert drawn.stdout == "11.0 s over the region, 1 clicks\n"
+    drawn = heat_map(plain_movie, picture)
+    assert (drawn.stdout, drawn.stderr) == ("11.0 s over the region, 1 clicks\n", "")
     pixels = image.imread(picture)[:, :, :3]
     assert pixels.shape == (540, 960, 3)
     dark = pixels[:, :860].sum(axis=2) < 0.3  # the scale stands to the right
