@@ -51,7 +51,7 @@ void compareAppends(const Measure& measure, const uuid& type, int version, int e
 
 template <class T, class ValueOf>
 void compareFixedSizeAppends(const std::string& name, const uuid& type, ValueOf valueOf) {
-    compareAppends<T>({"append a " + name + " entry, no flush", "memcpy and write(2) of 1 MiB", 1.5}, type, 1,
+    compareAppends<T>({"append one " + name + " entry, no flush", "memcpy and write(2) of 1 MiB", 1.5}, type, 1,
                       5'000'000, false, valueOf,
                       [&](RawWriter& writer, int i) { writer.append(double(i), valueOf(i)); });
 }

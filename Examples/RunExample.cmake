@@ -2,7 +2,7 @@
 # compares what it prints with EXPECTED. BEFORE, where there is one, runs ahead of it. Both get the ARGUMENT.
 file(REMOVE_RECURSE ${FOLDER})
 file(MAKE_DIRECTORY ${FOLDER})
-execute_process(COMMAND printf "\\0\\0\\0\\20ftypmp42\\0\\0\\0\\0" OUTPUT_FILE ${FOLDER}/Recording.mp4
+execute_process(COMMAND printf "\\0\\0\\0\\20ftypmp42\\0\\0\\0\\0" OUTPUT_FILE ${FOLDER}/Movie.mp4
   COMMAND_ERROR_IS_FATAL ANY)
 if(BEFORE)
   execute_process(COMMAND ${EMULATOR} ${BEFORE} ${ARGUMENT} WORKING_DIRECTORY ${FOLDER}

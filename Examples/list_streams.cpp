@@ -1,6 +1,5 @@
 // Lists what a recording holds, and the first entry of each stream: list_streams RECORDING
 
-#include "ZULMetaData/RecordingInfo.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
 #include <iostream>
@@ -40,10 +39,14 @@ void list(const FileLocation& recording) {
 } // namespace
 
 int main(int count, char** arguments) {
-    const auto parser = count == 2 ? MetaDataParser::create(arguments[1]) : nullptr;
-    if (!parser) {
+    if (count != 2) {
         std::cerr << "usage: list_streams RECORDING\n";
         return 2;
+    }
+    const auto parser = MetaDataParser::create(arguments[1]);
+    if (!parser) {
+        std::cerr << arguments[1] << ": cannot be opened\n";
+        return 1;
     }
     for (const uuid& type : parser->getAvailableMetaDataUUIDs())
         if (!RecordedKinds::visit(type, [&]<class Kind> { list<Kind>(arguments[1]); }))

@@ -38,10 +38,14 @@ private:
 } // namespace
 
 int main(int count, char** arguments) {
-    const auto parser = count == 2 ? MetaDataParser::create(arguments[1]) : nullptr;
-    if (!parser) {
+    if (count != 2) {
         std::cerr << "usage: own_observer RECORDING\n";
         return 2;
+    }
+    const auto parser = MetaDataParser::create(arguments[1]);
+    if (!parser) {
+        std::cerr << arguments[1] << ": cannot be opened\n";
+        return 1;
     }
     Odometer odometer(2.0);
     try {

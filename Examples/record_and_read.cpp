@@ -9,9 +9,9 @@ int main() {
     writer.finish();
     if (!writer.isHealthy()) // a full disk, say
         std::cerr << "only " << writer.entriesWritten() << " positions could be recorded\n";
-    ZULMAtomWriter().writeMetaDataFiles({"CursorLocation.dat"}, "Recording.mp4");
+    SafeMovieSave("Movie.mp4").attach({StreamSource::file("CursorLocation.dat")}); // throws where it cannot
 
-    CursorLocationMetaDataParser parser("Recording.mp4");
+    CursorLocationMetaDataParser parser("Movie.mp4");
     for (const EntryDictionary& entry : *parser.read())
         std::cout << entry.get<std::int32_t>("x") << ' ' << entry.get<float>("timestamp") << '\n';
 }

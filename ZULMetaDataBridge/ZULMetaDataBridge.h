@@ -5,6 +5,8 @@
 #include "Platform/FileLocation.h"
 #include "Platform/Image.h"
 #include "Platform/ProcessInfo.h"
+#include "ZULMetaData/MovieDuration.h"
+#include "ZULMetaData/RecordingInfo.h"
 #include "ZULMetaDataBridge/Source/ApplicationValues.h"
 #include "ZULMetaDataBridge/Source/EntryBuilding.h"
 #include "ZULMetaDataBridge/Source/EntryDictionary.h"

@@ -9,7 +9,7 @@ build=${BUILD:-build/abi}
 scripts/install.sh build abi
 cmake --preset release -B "$build" -DCMAKE_BUILD_TYPE=RelWithDebInfo -DBUILD_SHARED_LIBS=ON \
     -DZULMETADATA_BUILD_TESTS=OFF -DZULMETADATA_BUILD_TOOLS=OFF >/dev/null
-cmake --build "$build" >/dev/null
+cmake --build "$build" -- --quiet
 rm -rf "$build/installed"
 cmake --install "$build" --prefix "$build/installed" >/dev/null
 

@@ -7,6 +7,7 @@
 #   cppcheck  errors and slow or unportable code
 #   tidy      clang-tidy with the checks of .clang-tidy, on many sources of a library at once: what they include, which
 #             is most of the work, is looked at once for all of them
+#   analyse   clang-tidy's analyser, which follows what can happen at run time and takes some minutes
 # BUILD names another folder than build/check. Needs no network once everything is installed.
 set -euo pipefail
 cd "$(dirname "$0")/.."
@@ -23,7 +24,7 @@ check_format() {
 check_includes() {
     python3 scripts/check_includes.py
     configure headers -DCMAKE_VERIFY_INTERFACE_HEADER_SETS=ON
-    cmake --build "$build/headers" --target all_verify_interface_header_sets >/dev/null
+    cmake --build "$build/headers" --target all_verify_interface_header_sets -- --quiet
 }
 
 check_shell() {
@@ -37,20 +38,27 @@ check_spelling() {
 check_cppcheck() { # which cannot parse lambdas with template parameters yet
     cppcheck --quiet --enable=warning,performance,portability --std=c++20 --language=c++ --inline-suppr -I . \
         --suppress=missingIncludeSystem --suppress=syntaxError --suppress=internalAstError --error-exitcode=1 \
-        -j "$(nproc)" SharedDependencies ZULMetaData Platform ZULMetaDataBridge Bindings Tools
+        -j "$(nproc)" SharedDependencies ZULMetaData Platform ZULMetaDataBridge Bindings Tools Examples
 }
 
-check_tidy() {
+run_clang_tidy() { # OPTION...
     configure tidy -DZULMETADATA_BUILD_PYTHON=AUTO -DCMAKE_UNITY_BUILD=ON -DCMAKE_UNITY_BUILD_BATCH_SIZE=20
     sed -n 's/^ *"file": "\(.*\)".*/\1/p' "$build/tidy/compile_commands.json" |
         grep -vE '/Benchmarks/|/Tools/viewer/' | # the page in there is generated
-        xargs -P "$(nproc)" -n 1 clang-tidy -p "$build/tidy" --quiet --checks=-bugprone-suspicious-include \
-            --extra-arg=-Xclang --extra-arg=-analyzer-opt-analyze-headers 2> >(grep -v ' warnings generated' >&2)
+        xargs -P "$(nproc)" -n 1 clang-tidy -p "$build/tidy" --quiet "$@" 2> >(grep -v ' warnings generated' >&2)
 }
 
-scripts/install.sh build test lint
+check_tidy() {
+    run_clang_tidy '--checks=-clang-analyzer-*,-bugprone-suspicious-include' # as many sources come into one
+}
+
+check_analyse() {
+    run_clang_tidy '--checks=-*,clang-analyzer-*' --extra-arg=-Xclang --extra-arg=-analyzer-opt-analyze-headers
+}
+
+! command -v apt-get >/dev/null || scripts/install.sh build test lint # elsewhere what is missing says so itself
 steps=("$@")
-[ $# -gt 0 ] || steps=(format includes shell spelling cppcheck tidy)
+[ $# -gt 0 ] || steps=(format includes shell spelling cppcheck tidy analyse)
 for step in "${steps[@]}"; do
     echo "== $step"
     "check_$step"

@@ -6,8 +6,8 @@ set -euo pipefail
 cd "$(dirname "$0")/.."
 build=${BUILD:-build/package}
 
-scripts/install.sh build package
-cmake --preset release -B "$build" -DCMAKE_INSTALL_PREFIX=/usr -DBUILD_SHARED_LIBS=ON -DZULMETADATA_BUILD_TESTS=OFF \
+scripts/install.sh build viewer package
+cmake --preset release -B "$build" -DCMAKE_INSTALL_PREFIX=/usr -DBUILD_SHARED_LIBS=ON -DZULM_BUILD_VIEWER=ON \
     "$@" >/dev/null
 cmake --build "$build"
 rm -rf "$build/packages"

@@ -165,8 +165,8 @@ TEST_F(AttachCommand, ExaminesTheStreamsBeforeItCopiesTheMovie) {
          "short.dat: too short for a stream: 1 bytes of a 24-byte header; nothing was written"},
         {stream("same.dat", locationStream()),
          large +
-             ": has a stream of the kind cursorLocation already, at offset 198; --replace puts another one in front "
-             "of it; nothing was written"}};
+             ": has a stream of the kind cursorLocation already, at offset 198; --replace adds one that readers take "
+             "instead; nothing was written"}};
     for (const auto& [file, message] : refused) {
         const ToolResult result =
             runProgram("sh", {"-c", "ulimit -f 100; exec \"$0\" \"$@\"", ZULM_PATH, "attach", large, file, "-o", out});

@@ -132,7 +132,7 @@ void SavedMovie::commit() {
 void SavedMovie::fail(const SaveError& error) const {
     std::string text = fmt::format("{}: {}", error.file() == path_ ? subject_ : error.file(), error.sentence());
     if (error.reason() == SaveError::Reason::KindExists)
-        text += "; --replace puts another one in front of it";
+        text += "; --replace adds one that readers take instead";
     if (error.reason() != SaveError::Reason::NotUndone)
         text += copy_ ? "; nothing was written" : "; nothing was changed";
     throw Failure(text);

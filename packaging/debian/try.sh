@@ -6,14 +6,15 @@ apt-get install -y -qq --no-install-recommends ./packages/*.deb >/dev/null
 
 awk '/^```/ { inside = !inside && $0 == "```cpp"; next } inside' README.md >example.cpp
 g++ -std=c++20 example.cpp -lZULMetaDataBridge -lZULMetaData -o example
-printf '\0\0\0\20ftypmp42\0\0\0\0' >Recording.mp4
+printf '\0\0\0\20ftypmp42\0\0\0\0' >Movie.mp4
 
 {
     ./example
     zulm --version
-    zulm info Recording.mp4
-    zulm verify Recording.mp4
+    zulm info Movie.mp4
+    zulm verify Movie.mp4
 } >printed.txt
+zulm view Movie.mp4 -o Movie.html
 grep -qx '640 0' printed.txt
 grep -q '^ *cursorLocation .* 2 ' printed.txt
 
