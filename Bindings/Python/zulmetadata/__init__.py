@@ -6,9 +6,9 @@
     cursor = recording["cursorLocation"]        # a NumPy array of records
     print(len(cursor), cursor["time"][0], cursor["x"].max())
 
-A `Recording` looks for the streams of a file once, when it is made; their bytes are read anew each time that entries are
-asked for. Of a file that was changed since, make another one. What goes wrong with a file is an `OSError`, what is wrong
-with an argument a `ValueError`, `TypeError` or `KeyError`; a movie that could not be changed is a `SaveError`.
+A `Recording` looks for the streams of a file once, when it is made; their bytes are read anew each time that entries
+are asked for. Of a file that was changed since, make another one. What goes wrong with a file is an `OSError`, what is
+wrong with an argument a `ValueError`, `TypeError` or `KeyError`; a movie that could not be changed is a `SaveError`.
 """
 
 from __future__ import annotations
@@ -133,9 +133,9 @@ class StreamWriter:
     the disk does not take is an `OSError`.
 
     Values are looked at before any of them is written: a number that its field cannot hold, a fraction or not-a-number
-    for an integer, is a `ValueError`, whatever type it comes in. Only coordinates may have fractions, which are cut off,
-    as the library does for applications. A text is a `str`, or `bytes`; anything else is a `TypeError`. An image is
-    `bytes`, or None where an earlier entry with the same identifier has it: hot spot and type are then not stored.
+    for an integer, is a `ValueError`, whatever type it comes in. Only coordinates may have fractions, which are cut
+    off, as the library does for applications. A text is a `str`, or `bytes`; anything else is a `TypeError`. An image
+    is `bytes`, or None where an earlier entry with the same `id` has it: hot spot and type are then not stored.
     """
 
     def __init__(self, path: _Path, kind: str) -> None:
@@ -187,8 +187,8 @@ class StreamWriter:
 
 
 def write_stream(path: _Path, kind: str, entries: _Records | _Rows) -> None:
-    """Writes a whole stream file, of entries as `StreamWriter.extend` takes them. Where they do not fit, a file that was
-    there stays what it was."""
+    """Writes a whole stream file, of entries as `StreamWriter.extend` takes them. Where they do not fit, a file that
+    was there stays what it was."""
     _core.write_stream(os.fspath(path), kind, _records_of(entries, dtype_of(kind), _core.coordinates_of(kind)))
 
 

@@ -1,5 +1,5 @@
-"""Makes the records that the core stores of what callers give as entries. Whatever would not be stored as it was given is
-refused before anything is converted."""
+"""Makes the records that the core stores of what callers give as entries. Whatever would not be stored as it was given
+is refused before anything is converted."""
 
 from __future__ import annotations
 

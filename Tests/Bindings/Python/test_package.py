@@ -73,7 +73,8 @@ import numpy as np
 import zulmetadata
 
 zulmetadata.write_stream("a.dat", "slideTitles", [(0.0, "a")])
-zulmetadata.write_stream(pathlib.Path("a.dat"), "cursorImage", [(0.0, 1, 0, 0, 2, 3, b"image"), (1, 1, 0, 0, 2, 3, None)])
+zulmetadata.write_stream(pathlib.Path("a.dat"), "cursorImage",
+                         [(0.0, 1, 0, 0, 2, 3, b"image"), (1, 1, 0, 0, 2, 3, None)])
 zulmetadata.write_stream("a.dat", "cursorLocation", [[0.0, 1, 2], [3.0, 4, 5]])
 zulmetadata.write_stream("a.dat", "cursorLocation", np.zeros((2, 3)))
 with zulmetadata.StreamWriter("a.dat", "cursorLocation") as writer:
@@ -90,7 +91,8 @@ def test_documented_use_is_typed(tmp_path):
     consumer.write_text(CONSUMER)
     package = pathlib.Path(zulmetadata.__file__).parent.parent
     run("mypy", "--strict", str(consumer), MYPY_CACHE_DIR=str(tmp_path), MYPYPATH=str(package))
-    consumer.write_text(CONSUMER + 'zulmetadata.write_stream("a.dat", "slideTitles", "a")\nzulmetadata.attach("m.mp4", 5)\n')
+    wrong = 'zulmetadata.write_stream("a.dat", "slideTitles", "a")\nzulmetadata.attach("m.mp4", 5)\n'
+    consumer.write_text(CONSUMER + wrong)
     refused = subprocess.run([sys.executable, "-m", "mypy", "--strict", str(consumer)], capture_output=True, text=True,
                              env=os.environ | {"MYPY_CACHE_DIR": str(tmp_path), "MYPYPATH": str(package)})
     assert refused.stdout.count("[arg-type]") == 2 and "Found 2 errors" in refused.stdout

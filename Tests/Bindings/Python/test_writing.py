@@ -132,7 +132,7 @@ def comings(value):
                 yield np.array([(0, value)], kind)
 
 
-@pytest.mark.parametrize("value", [2**31, -2**31 - 200, 2**40, 2**63, 2**64, 2**70, 1e300, float("nan"), float("inf"), 1.5])
+@pytest.mark.parametrize("value", [2**31, -2**31 - 200, 2**40, 2**63, 2**64, 2**70, 1e300, np.nan, np.inf, 1.5])
 def test_numbers_that_do_not_fit_are_value_errors_however_they_come(tmp_path, value):
     with zulmetadata.StreamWriter(tmp_path / "stream.dat", "cursorAction") as writer:
         for entries in comings(value):
@@ -160,13 +160,20 @@ def test_large_identifiers_are_exact(tmp_path):
         zulmetadata.write_stream(tmp_path / "a.dat", "cursorImage", [(0, 2.0**64, 0, 0, 0, 0, None)])
 
 
+def test_beside_no_image_hot_spot_and_type_are_not_stored(tmp_path):
+    entries = [(0, 1, 5, 6, 2, 3, b"an image"), (1, 1, 5, 6, 2, 3, None)]
+    zulmetadata.write_stream(tmp_path / "a.dat", "cursorImage", entries)
+    assert zulmetadata.Recording(tmp_path / "a.dat")["cursorImage"].tolist() == [entries[0], (1, 1, 0, 0, -1, 3, None)]
+
+
 def test_fractions_of_coordinates_are_cut_off(tmp_path):
     for kind in ("cursorLocation", "recordingRegion", "cursorImage"):
         fields = zulmetadata.dtype_of(kind)
         entry = [2.9 if name in ("x", "y", "width", "height") or "Offset" in name else 1 for name in fields.names]
         if kind == "cursorImage":
             entry[-1] = b"an image"
-        zulmetadata.write_stream(tmp_path / "a.dat", kind, [entry, [-value if value == 2.9 else value for value in entry]])
+        negative = [-value if value == 2.9 else value for value in entry]
+        zulmetadata.write_stream(tmp_path / "a.dat", kind, [entry, negative])
         first, second = zulmetadata.Recording(tmp_path / "a.dat")[kind].tolist()
         assert set(first[1:]) - {1, b"an image"} == {2} and set(second[1:]) - {1, b"an image"} == {-2}
 
