@@ -119,8 +119,11 @@ AttachResult attach(const FileLocation& movie, const py::iterable& streams, bool
                                        replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse);
 }
 
-StampResult stamp(const FileLocation& movie, const std::string& creator, const std::string& version) {
-    return SafeMovieSave(movie).stamp(creator, version);
+CreatorAttributes stamp(const FileLocation& movie, const py::object& creator, const py::object& version) {
+    const std::string creatorName = storedText(creator);
+    const std::string creatorVersion = storedText(version);
+    const py::gil_scoped_release others;
+    return SafeMovieSave(movie).stamp(creatorName, creatorVersion).info.creator;
 }
 
 RepairPlan repair(const FileLocation& movie, bool dryRun) {
@@ -328,12 +331,7 @@ void addSaving(py::module_& module) {
             return py::str("<Attached streams={} repair={}>").format(attached.streams.size(), stateOf(attached.repair));
         });
     module.def("attach", attach, py::arg("movie"), py::arg("streams"), py::arg("replace"));
-    module.def(
-        "stamp",
-        [](const FileLocation& movie, const std::string& creator, const std::string& version) {
-            return stamp(movie, creator, version).info.creator;
-        },
-        py::arg("movie"), py::arg("creator"), py::arg("version"), py::call_guard<py::gil_scoped_release>());
+    module.def("stamp", stamp, py::arg("movie"), py::arg("creator"), py::arg("version"));
 }
 
 void addVerifying(py::module_& module) {

@@ -82,6 +82,10 @@ def test_creators_that_are_no_texts(plain_movie):
     plain_movie.write_bytes(plain_movie.read_bytes().replace(b"Mac\0", b"M\xffc\0").replace(b"4.2\0", b"\xfe.2\0"))
     (creator,) = zulmetadata.Recording(plain_movie).creators
     assert (creator.name, creator.version) == ("M\udcffc", "\udcfe.2")
+    assert zulmetadata.stamp(plain_movie, "Recorder", creator.version).version == creator.version
+    assert b"\xfe.2\0" in plain_movie.read_bytes()[-60:]
+    with pytest.raises(ValueError, match="zero character"):
+        zulmetadata.stamp(plain_movie, "Recorder", "4\0002")
 
 
 def test_repair(tmp_path):
