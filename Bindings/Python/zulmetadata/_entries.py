@@ -50,7 +50,9 @@ def _columns(entries: Records | Rows, names: tuple[str, ...]) -> dict[str, Colum
         entries = entries.tolist()
     if not isinstance(entries, Sequence) or isinstance(entries, (str, bytes, bytearray)):
         raise TypeError(f"entries are a sequence of tuples or an array, and not {type(entries).__name__}")
-    rows = [_row(entry, names) for entry in entries]
+    rows: Sequence[Any] = entries
+    if not (set(map(type, rows)) <= {tuple, list} and set(map(len, rows)) == {len(names)}):
+        rows = [_row(entry, names) for entry in entries]
     return dict(zip(names, zip(*rows))) if rows else {name: () for name in names}
 
 
@@ -82,7 +84,7 @@ def _objects(column: Column) -> Records:
 
 
 def _numbers(column: Column) -> Records:
-    """As wide as they are: Python's integers as objects, since NumPy takes large ones for floating-point numbers."""
+    """As wide as they are: Python's large integers as objects, which NumPy takes for floating-point numbers."""
     if isinstance(column, np.ndarray) and column.dtype.kind != "O":
         if column.ndim != 1 or column.dtype.kind not in "biuf":
             raise ValueError(f"a number is wanted, and not {column.dtype}")
@@ -91,7 +93,10 @@ def _numbers(column: Column) -> Records:
     for kind in types:
         if not issubclass(kind, (Real, np.bool_)):
             raise ValueError(f"a number is wanted, and not {kind.__name__}")
-    return np.array(column, object if all(issubclass(kind, Integral) for kind in types) else float)
+    if not all(issubclass(kind, Integral) for kind in types):
+        return np.array(column, float)
+    numbers = np.array(column)
+    return numbers if numbers.dtype.kind in "biu" else np.array(column, object)
 
 
 def _stored(numbers: Records, kind: np.dtype[Any], is_coordinate: bool) -> Records:
