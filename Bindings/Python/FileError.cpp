@@ -4,6 +4,7 @@
 
 #include <cerrno>
 #include <exception>
+#include <utility>
 
 namespace ZULMetaData::Python {
 

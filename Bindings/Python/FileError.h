@@ -5,7 +5,6 @@
 #include "Platform/FileLocation.h"
 
 #include <system_error>
-#include <utility>
 
 namespace ZULMetaData::Python {
 

@@ -19,7 +19,6 @@
 #include <cerrno>
 #include <fstream>
 #include <optional>
-#include <system_error>
 #include <utility>
 
 namespace ZULMetaData::Python {
