@@ -35,11 +35,8 @@ function(zulm_find_libraries_from target folder)
     return()
   endif()
   cmake_path(RELATIVE_PATH CMAKE_INSTALL_FULL_LIBDIR BASE_DIRECTORY ${folder} OUTPUT_VARIABLE way)
-  if(APPLE)
-    set_target_properties(${target} PROPERTIES INSTALL_RPATH @loader_path/${way})
-  else()
-    set_target_properties(${target} PROPERTIES INSTALL_RPATH $ORIGIN/${way})
-  endif()
+  set(here $<IF:$<PLATFORM_ID:Darwin>,@loader_path,$ORIGIN>) # the folder of what looks for them
+  set_target_properties(${target} PROPERTIES INSTALL_RPATH ${here}/${way})
 endfunction()
 
 zulm_install_library(ZULMetaData Core zulmetadata-core)

@@ -170,12 +170,13 @@ py::list coordinatesOf(const uuid& kind) {
     py::list names;
     RecordedKinds::visit(kind, [&names]<class Kind>() {
         using Value = typename Kind::Value;
-        const auto add = [&names](const auto&... field) { (names.append(field.key), ...); };
-        if constexpr (std::is_same_v<Value, Point> || std::is_same_v<Value, Rect>)
-            std::apply(add, Kind::fields);
-        else if constexpr (std::is_same_v<Value, CursorImage>)
-            for (const char* name : {"hotspotOffsetX", "hotspotOffsetY"})
-                names.append(name);
+        const auto add = [&names]<class Projection>(const Field<Projection>& field) {
+            using Result = std::decay_t<std::invoke_result_t<Projection, const Value&>>;
+            if constexpr (std::is_same_v<Result, std::int32_t>)
+                names.append(field.key);
+        };
+        if constexpr (std::is_same_v<Value, Point> || std::is_same_v<Value, Rect> || std::is_same_v<Value, CursorImage>)
+            std::apply([&add](const auto&... field) { (add(field), ...); }, Kind::fields);
     });
     return names;
 }
