@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # Looks at the sources without running them. Usage: scripts/check.sh [STEP...]; all steps where none is named:
 #   format    clang-format
-#   includes  which room includes what, and that every header that is installed compiles alone
+#   includes  which folder includes what, and that every header that is installed compiles alone
 #   shell     shellcheck
 #   spelling  codespell
 #   cppcheck  errors and slow or unportable code

@@ -1,6 +1,6 @@
-"""Reads the includes of every room and says which of them do not keep to Docs/architecture.md.
+"""Reads the includes of every source file and reports those that Docs/architecture.md does not allow.
 
-Usage: check_includes.py [FOLDER], the project's folder where it is another than this one's.
+Usage: check_includes.py [FOLDER]; FOLDER is the project's folder, by default the one that this script belongs to.
 """
 
 import pathlib
@@ -8,7 +8,7 @@ import re
 import sys
 
 STANDARD_ONLY = ["SharedDependencies", "ZULMetaData", "ZULMetaDataBridge"]
-ONE_ROOM_ONLY = {  # headers of others, and the only folder that may know them
+ONE_FOLDER_ONLY = {  # headers of other libraries, and the only folder that may include them
     r"png|tiff": "Platform",
     r"Python\.h|pybind11/|numpy/": "Bindings/Python",
     r"emscripten": "Bindings/JavaScript",
@@ -17,53 +17,53 @@ INCLUDE = re.compile(r'^\s*#\s*include\s*([<"])([^>"]+)[>"]', re.MULTILINE)
 SYSTEM = re.compile(r"^\s*#\s*(?:el)?if.*(?:__APPLE__|__linux__|_WIN32|__unix__)", re.MULTILINE)
 
 
-def floors(root):
-    """Which rooms each room may include, by the table of the page."""
+def layers(root):
+    """Returns which folders each folder may include, as the table of the page says."""
     page = (root / "Docs" / "architecture.md").read_text(encoding="utf-8")
-    table = page.partition("<!-- floors begin -->")[2].partition("<!-- floors end -->")[0]
+    table = page.partition("<!-- layers begin -->")[2].partition("<!-- layers end -->")[0]
     rows = re.findall(r"^\| *(\d+) *\| `(\w+)` \|[^|]*\|([^|]*)\|$", table, re.MULTILINE)
-    below = {room: re.findall(r"`(\w+)`", rooms) for _, room, rooms in rows}
-    height = {room: int(floor) for floor, room, _ in rows}
-    for room, rooms in below.items():
-        for lower in rooms:
-            # Bindings are made of the reports of the tool, beside which they stand.
-            if height[lower] >= height[room] and (room, lower) != ("Bindings", "Tools"):
-                sys.exit(f"Docs/architecture.md: {lower} is not below {room}")
+    below = {folder: re.findall(r"`(\w+)`", folders) for _, folder, folders in rows}
+    height = {folder: int(layer) for layer, folder, _ in rows}
+    for folder, folders in below.items():
+        for lower in folders:
+            # The bindings use the reports of the tool, which is in the same layer.
+            if height[lower] >= height[folder] and (folder, lower) != ("Bindings", "Tools"):
+                sys.exit(f"Docs/architecture.md: {lower} is not below {folder}")
     if len(below) < 7:
-        sys.exit("Docs/architecture.md: has no table of the floors")
+        sys.exit("Docs/architecture.md: has no table of the layers")
     return below
 
 
 def installed_headers(root):
     headers = set()
-    for room in ("SharedDependencies", "ZULMetaData", "Platform", "ZULMetaDataBridge"):
-        text = (root / room / "CMakeLists.txt").read_text(encoding="utf-8")
-        headers.update(f"{room}/{name}" for name in re.findall(r"^\s+([\w/]+\.h)\b", text, re.MULTILINE))
+    for folder in ("SharedDependencies", "ZULMetaData", "Platform", "ZULMetaDataBridge"):
+        text = (root / folder / "CMakeLists.txt").read_text(encoding="utf-8")
+        headers.update(f"{folder}/{name}" for name in re.findall(r"^\s+([\w/]+\.h)\b", text, re.MULTILINE))
     return headers
 
 
-def complaints_about(root, file, room, below, installed):
+def complaints_about(root, file, folder, below, installed):
     text = file.read_text(encoding="utf-8")
     path = str(file.relative_to(root))
     for kind, name in INCLUDE.findall(text):
         if kind == "<":
-            if room in STANDARD_ONLY and not re.fullmatch(r"[a-z_]+", name):
-                yield f"<{name}> is not of the C++ standard library"
-            for pattern, folder in ONE_ROOM_ONLY.items():
-                if re.match(pattern, name) and not path.startswith(folder + "/"):
-                    yield f"<{name}> is for {folder} alone"
+            if folder in STANDARD_ONLY and not re.fullmatch(r"[a-z_]+", name):
+                yield f"<{name}> is not a header of the C++ standard library"
+            for pattern, user in ONE_FOLDER_ONLY.items():
+                if re.match(pattern, name) and not path.startswith(user + "/"):
+                    yield f"<{name}> may be included in {user} only"
         elif not (root / name).is_file():
-            yield f'"{name}" is no file of this project'
-        elif name.split("/")[0] not in [room, *below]:
-            yield f'"{name}" is not below {room}'
+            yield f'"{name}" is not a file of this project'
+        elif name.split("/")[0] not in [folder, *below]:
+            yield f'"{name}" is not below {folder}'
         elif path in installed and name not in installed:
             yield f'"{name}" is not installed, but this header is'
-    if room in STANDARD_ONLY and SYSTEM.search(text):
-        yield "it asks which operating system this is; Platform knows"
+    if folder in STANDARD_ONLY and SYSTEM.search(text):
+        yield "it has a condition on the operating system; move that to Platform"
 
 
 def circles(included):
-    """Headers that include themselves by way of others, each as the way there."""
+    """Finds headers that include themselves through others, and yields each with the headers on the way."""
     done = set()
 
     def walk(header, way):
@@ -82,19 +82,19 @@ def circles(included):
 
 def main():
     root = pathlib.Path(sys.argv[1] if len(sys.argv) > 1 else pathlib.Path(__file__).parent.parent)
-    below = floors(root)
+    below = layers(root)
     installed = installed_headers(root)
     complaints = []
     included = {}
-    for room in below:
-        for file in sorted((root / room).rglob("*")):
+    for folder in below:
+        for file in sorted((root / folder).rglob("*")):
             if file.suffix not in (".h", ".cpp") or "node_modules" in file.parts:
                 continue
             path = str(file.relative_to(root))
             names = INCLUDE.findall(file.read_text(encoding="utf-8"))
             included[path] = [name for kind, name in names if kind == '"']
-            complaints += [f"{path}: {text}" for text in complaints_about(root, file, room, below[room], installed)]
-    complaints += [f"{way[0]}: includes itself by way of {', '.join(way[1:-1])}" for way in circles(included)]
+            complaints += [f"{path}: {text}" for text in complaints_about(root, file, folder, below[folder], installed)]
+    complaints += [f"{way[0]}: includes itself through {', '.join(way[1:-1])}" for way in circles(included)]
     print(*complaints, sep="\n", end="\n" if complaints else "")
     if not included:
         print(f"{root}: no sources", file=sys.stderr)
