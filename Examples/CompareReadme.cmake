@@ -1,4 +1,4 @@
-# The README must show the example to the letter.
+# Checks that the README shows the example exactly.
 file(READ ${README} readme)
 file(READ ${EXAMPLE} example)
 string(FIND "${readme}" "```cpp\n${example}```" position)

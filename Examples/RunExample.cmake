@@ -1,5 +1,5 @@
-# Runs PROGRAM, under the EMULATOR where there is one, in a FOLDER that holds a movie of nothing but a file type, and
-# compares what it prints with EXPECTED. BEFORE, where there is one, runs ahead of it. Both get the ARGUMENT.
+# Runs PROGRAM, under EMULATOR if it is set, in a FOLDER with a movie that consists of a file type atom only. Compares what
+# it prints with EXPECTED. If BEFORE is set, that program runs first. Both get the ARGUMENT.
 file(REMOVE_RECURSE ${FOLDER})
 file(MAKE_DIRECTORY ${FOLDER})
 execute_process(COMMAND printf "\\0\\0\\0\\20ftypmp42\\0\\0\\0\\0" OUTPUT_FILE ${FOLDER}/Movie.mp4

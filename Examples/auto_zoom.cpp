@@ -1,4 +1,4 @@
-// What an editor does with clicks: where to zoom in, from when to when, and around which part of the picture.
+// Computes from the clicks where an editor should zoom in: from when to when, and into which area.
 // auto_zoom RECORDING
 
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
@@ -11,8 +11,8 @@ using namespace ZULMetaData;
 
 namespace {
 
-constexpr float s_before = 0.3F; // seconds that a zoom begins ahead of its click
-constexpr float s_after = 1.0F;  // and stays
+constexpr float s_before = 0.3F; // a zoom begins this many seconds before its click
+constexpr float s_after = 1.0F;  // and ends this many seconds after it
 constexpr int s_factor = 2;
 
 struct Zoom {
@@ -30,7 +30,7 @@ Rect regionOf(const FileLocation& recording) {
             entry.get<std::int32_t>("height")};
 }
 
-/// The last position at `time` or in front of it.
+/// Returns the last position at or before `time`.
 Point positionAt(float time, const EntryList& locations) {
     const auto after =
         std::upper_bound(locations.begin(), locations.end(), time, [](float asked, const EntryDictionary& entry) {
@@ -41,7 +41,7 @@ Point positionAt(float time, const EntryList& locations) {
     return {(after - 1)->get<std::int32_t>("x"), (after - 1)->get<std::int32_t>("y")};
 }
 
-/// Around `center`, but inside the region.
+/// Returns an area around `center` that lies inside the region.
 Rect areaAround(const Point& center, const Rect& region) {
     const int width = region.width / s_factor;
     const int height = region.height / s_factor;
@@ -60,7 +60,7 @@ std::vector<Zoom> zoomsOf(const FileLocation& recording) {
         const float time = action.get<float>("timestamp");
         const Rect area = areaAround(positionAt(time, *locations), region);
         if (!zooms.empty() && time - s_before <= zooms.back().to)
-            zooms.back().to = time + s_after; // one zoom holds while clicks follow each other
+            zooms.back().to = time + s_after; // clicks that follow each other share one zoom
         else
             zooms.push_back({std::max(0.0F, time - s_before), time + s_after, area});
     }

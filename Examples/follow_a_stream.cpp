@@ -1,4 +1,4 @@
-// Follows a stream file while a recorder still writes it: another thread here, any other process elsewhere.
+// Reads a stream file while a recorder still writes it. Here the recorder is another thread; it may be another process.
 
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
@@ -12,8 +12,8 @@ using namespace ZULMetaData;
 
 namespace {
 
-/// Gives the positions that have come since it was last asked. Entries reach the file when the writer flushes; one that
-/// is there in part only is left for the next time.
+/// Delivers the positions that were written since the last call. Entries reach the file when the writer flushes. An
+/// entry of which the file holds only a part is left for the next call.
 class CursorFollower {
 public:
     explicit CursorFollower(const FileLocation& file) : path_(file) {}
@@ -43,14 +43,14 @@ private:
 
 int main() {
     const FileLocation file = "followed.dat";
-    CursorLocationMetaDataWriter writer(file); // creates the file, so that there is one to follow
+    CursorLocationMetaDataWriter writer(file); // creates the file that is followed
     std::atomic<int> seen = 0;
     std::thread recorder([&] {
-        for (int entry = 0; entry <= 30; ++entry) // flushed: the 1st, the 16th and the 31st
+        for (int entry = 0; entry <= 30; ++entry) // the 1st, 16th and 31st are flushed
             writer.write(ScreenPoint(entry * 10, 100), MediaTime(entry, 10));
         while (seen < 31)
             std::this_thread::sleep_for(std::chrono::milliseconds(1));
-        writer.write(ScreenPoint(999, 100), MediaTime(31, 10)); // waits in the buffer until the file is closed
+        writer.write(ScreenPoint(999, 100), MediaTime(31, 10)); // stays in the buffer until the file is closed
         writer.finish();
     });
 

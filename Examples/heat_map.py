@@ -11,7 +11,7 @@ import matplotlib.pyplot as plt
 import numpy as np
 import zulmetadata
 
-LEFT_DOWN, RIGHT_DOWN = 1, 4  # the bits that zulmetadata.action_text puts into words
+LEFT_DOWN, RIGHT_DOWN = 1, 4  # the bits that zulmetadata.action_text turns into texts
 
 parser = argparse.ArgumentParser(description=__doc__)
 parser.add_argument("recording", metavar="RECORDING")
@@ -35,13 +35,13 @@ cursor = recorded("cursorLocation", least=1)
 clicks = recorded("cursorAction", least=0)
 region = recorded("recordingRegion", least=1)[-1]
 
-# %% How long the cursor stayed at each place: until the next position came
+# %% How long the cursor stayed at each place: until the next position
 seconds = np.diff(cursor["time"], append=max(recording.duration or 0, cursor["time"][-1]))
 left, top, width, height = (int(region[name]) for name in ("x", "y", "width", "height"))
 heat, rows, columns = np.histogram2d(
     cursor["y"], cursor["x"], bins=(18, 32), range=((top, top + height), (left, left + width)), weights=seconds)
 
-# %% Where it was clicked: the last position in front of each click
+# %% Where the clicks were: the last position before each click
 pressed = clicks[clicks["rawActionValue"] & (LEFT_DOWN | RIGHT_DOWN) != 0]
 nearest = np.searchsorted(cursor["time"], pressed["time"], side="right") - 1
 places = cursor[nearest[nearest >= 0]]

@@ -1,4 +1,4 @@
-// Lists what a recording holds, and the first entry of each stream: list_streams RECORDING
+// Lists the streams of a recording, and the first entry of each: list_streams RECORDING
 
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 

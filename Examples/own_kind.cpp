@@ -1,5 +1,5 @@
-// Keeps something of one's own in a recording: a stream of a kind that this library does not know. own_kind MOVIE
-// Readers that do not know the kind leave it alone; saving and `zulm` carry it along.
+// Records a kind that the library does not know, and reads it back: own_kind MOVIE
+// Readers that do not know the kind ignore it. `SafeMovieSave` and `zulm` copy it like any other stream.
 
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
@@ -10,7 +10,7 @@ using namespace ZULMetaData;
 
 namespace {
 
-/// Made once, with any generator of UUIDs.
+/// Make it once, with any UUID generator.
 constexpr uuid s_heartRateUUID{
     {0x5d, 0x1c, 0x0a, 0x6e, 0x0b, 0x7f, 0x4c, 0x35, 0x9e, 0x0d, 0x43, 0xa1, 0x6b, 0x2f, 0x88, 0x17}};
 constexpr int s_version = 1;
@@ -23,8 +23,8 @@ void record(const FileLocation& file) {
     writer.close();
 }
 
-/// Checks every size, and needs no kind: `MetaDataParser::loadDataType` would do too, but tells on standard output that
-/// it does not know this one.
+/// `StreamEntries` checks every size and works for any kind. `MetaDataParser::loadDataType` works too, but prints on
+/// standard output that it does not know this kind.
 void read(const FileLocation& movie) {
     const auto parser = MetaDataParser::create(movie.string());
     const auto place = parser->fileDataForUUID(s_heartRateUUID);

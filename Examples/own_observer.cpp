@@ -1,5 +1,5 @@
-// Takes entries one by one as they are read, without a list of them: how far the cursor went in the first seconds.
-// own_observer RECORDING
+// Receives entries one by one while they are read, without a list, to measure how far the cursor moved in the first
+// seconds: own_observer RECORDING
 
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
@@ -17,7 +17,7 @@ public:
 
     bool dataRead(double time, const Point& location) override {
         if (time > end_)
-            return false; // nothing more is read
+            return false; // ends the reading
         if (previous_)
             pixels_ += std::hypot(location.x - previous_->x, location.y - previous_->y);
         previous_ = location;
@@ -50,7 +50,7 @@ int main(int count, char** arguments) {
     Odometer odometer(2.0);
     try {
         parser->loadDataType<Point>(s_cursorLocationUUID, odometer, -1);
-    } catch (const std::runtime_error& error) { // the last time is cut short; entries in front of it have come
+    } catch (const std::runtime_error& error) { // the last entry is torn; those before it were delivered
         std::cerr << error.what() << '\n';
     }
     std::cout << odometer.positions() << " positions, " << std::lround(odometer.pixels()) << " pixels\n";

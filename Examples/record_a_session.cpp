@@ -1,4 +1,4 @@
-// Records a session of four seconds, puts it into a movie and stamps the movie: record_a_session MOVIE
+// Records a session of four seconds, attaches it to a movie and stamps the movie: record_a_session MOVIE
 // The stream files stay beside the movie.
 
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
@@ -10,7 +10,7 @@ using namespace ZULMetaData;
 
 namespace {
 
-constexpr int s_leftDown = 1; // the bits that HumanReadableActions puts into words
+constexpr int s_leftDown = 1; // the bits that HumanReadableActions turns into texts
 constexpr int s_leftUp = 2;
 
 MediaTime milliseconds(int value) {
@@ -41,7 +41,7 @@ std::vector<FileLocation> recordInto(const FileLocation& folder) {
         if (!writer->isHealthy())
             std::cerr << writer->metaDataFile() << ": not everything could be recorded\n";
     return {region.metaDataFile(), application.metaDataFile(), location.metaDataFile(), action.metaDataFile()};
-} // the writers close their files
+} // here the destructors of the writers close the files
 
 void saveInto(const FileLocation& movie, const std::vector<FileLocation>& files) {
     std::vector<StreamSource> streams;
@@ -63,7 +63,7 @@ int main(int count, char** arguments) {
     try {
         const FileLocation movie = arguments[1];
         saveInto(movie, recordInto(movie.parent_path()));
-    } catch (const SaveError& error) { // the movie is what it was
+    } catch (const SaveError& error) { // the movie is unchanged
         std::cerr << error.what() << '\n';
         return 1;
     }

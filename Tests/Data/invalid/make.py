@@ -1,7 +1,7 @@
 #!/usr/bin/env python3
-"""Makes the corpus of invalid recordings, byte by byte, with what a validator must find in each.
+"""Makes the corpus of invalid recordings byte by byte, and lists what a validator must find in each.
 
-Writes the files beside itself, expected.tsv (read by the tests) and README.md (read by people).
+Writes the files into its own folder, and with them expected.tsv, which the tests read, and README.md for people.
 """
 
 import os
@@ -39,7 +39,7 @@ def atom(kind, payload=b""):
 
 
 def sized_atom(kind, size, payload=b"", mark=1):
-    """Extended form with whatever size, and whatever in place of the mark."""
+    """Makes an atom in the long form with any size, and with `mark` in place of the 1."""
     return be32(mark) + kind + be64(size) + payload
 
 
@@ -133,17 +133,17 @@ def invalid(name, contents, why, *findings):
 
 def movies():
     good = MEDIA + zulm(data(LOCATIONS))
-    invalid("movie-trailing-bytes.mp4", good + b"\0" * 5, "5 bytes behind the last atom are no atom",
+    invalid("movie-trailing-bytes.mp4", good + b"\0" * 5, "the 5 bytes after the last atom are not an atom",
             ("trailing-bytes", len(good)))
     invalid("movie-trailing-half-header.mp4", good + be32(1) + b"free" + b"\0" * 4,
-            "the file ends inside an extended size", ("trailing-bytes", len(good)))
+            "the file ends inside an 64-bit size", ("trailing-bytes", len(good)))
     invalid("movie-open-media.mp4", atom(b"ftyp", b"mp42") + be32(0) + b"mdat" + b"0123456789",
             "the media data was never closed", ("open-ended-atom", 12))
     invalid("movie-open-media-hides-metadata.mp4",
             atom(b"ftyp", b"mp42") + be32(0) + b"mdat" + b"0123456789" + zulm(data(LOCATIONS)),
-            "the open media data swallows the metadata behind it", ("open-ended-atom", 12))
+            "the open media data includes the metadata after it", ("open-ended-atom", 12))
     invalid("movie-open-extended-media.mp4", atom(b"ftyp", b"mp42") + sized_atom(b"mdat", 0, b"0123456789"),
-            "the extended size of the media data is 0", ("open-ended-atom", 12))
+            "the 64-bit size of the media data is 0", ("open-ended-atom", 12))
     invalid("movie-interrupted-append.mp4", MEDIA + sized_atom(b"ZULM", 0, data(LOCATIONS)),
             "the size of the ZULM was never set", ("open-ended-atom", ZULM), ("unreachable-stream", STREAM))
     invalid("movie-interrupted-append-empty.mp4", MEDIA + sized_atom(b"ZULM", 0),
@@ -157,13 +157,13 @@ def movies():
     invalid("movie-size-marker-child-7.mp4", MEDIA + zulm(sized_atom(b"DATA", 16 + len(LOCATIONS), LOCATIONS, mark=7)),
             "the 32-bit size of the DATA is 7", ("size-marker", FIRST))
     invalid("movie-size-marker-child-0.mp4", MEDIA + zulm(sized_atom(b"DATA", 16 + len(LOCATIONS), LOCATIONS, mark=0)),
-            "the 32-bit size of the DATA is 0, though an extended size follows", ("size-marker", FIRST))
+            "the 32-bit size of the DATA is 0, though an 64-bit size follows", ("size-marker", FIRST))
     invalid("movie-size-below-header.mp4", MEDIA + sized_atom(b"free", 15, b"\0" * 16) + zulm(data(LOCATIONS)),
-            "an extended size of 15 does not cover its own header", ("size-below-header", ZULM))
+            "an 64-bit size of 15 does not cover its own header", ("size-below-header", ZULM))
     invalid("movie-size-below-header-child.mp4", MEDIA + zulm(sized_atom(b"DATA", 8, LOCATIONS)),
-            "the extended size of the DATA is 8", ("size-below-header", FIRST))
+            "the 64-bit size of the DATA is 8", ("size-below-header", FIRST))
     invalid("movie-media-beyond-file.mp4", atom(b"ftyp", b"mp42") + be32(19) + b"mdat" + b"0123456789",
-            "the media data says one byte more than there is", ("beyond-file", 12))
+            "the media data states one byte more than there is", ("beyond-file", 12))
     invalid("movie-media-wraps-around.mp4",
             atom(b"ftyp", b"mp42") + sized_atom(b"mdat", 2**64 - 12, b"0123456789") + zulm(data(LOCATIONS)),
             "the end of the media data wraps around 64 bits to the start of the file", ("beyond-file", 12))
@@ -179,18 +179,18 @@ def movies():
             ("beyond-file", ZULM), ("trailing-bytes", FIRST))
     invalid("movie-zulm-too-small.mp4",
             MEDIA + sized_atom(b"ZULM", 16 + 16 + 24 + 16, data(LOCATIONS)) + atom(b"free", b"\0" * 8),
-            "the ZULM ends inside its DATA, and its second half is no atom", ("beyond-parent", FIRST),
+            "the ZULM ends inside its DATA, and its second half is not an atom", ("beyond-parent", FIRST),
             ("open-ended-atom", STREAM + 40))
     invalid("movie-data-beyond-zulm.mp4", MEDIA + zulm(sized_atom(b"DATA", 16 + 56 + 16, LOCATIONS)) + ZULR,
-            "the DATA says one entry more than its ZULM holds", ("beyond-parent", FIRST))
+            "the DATA states one entry more than its ZULM holds", ("beyond-parent", FIRST))
     invalid("movie-data-beyond-file.mp4", MEDIA + zulm(sized_atom(b"DATA", 2**63 - 1, LOCATIONS)),
-            "the DATA says 8 EiB", ("beyond-file", FIRST))
+            "the DATA states a size of 8 EiB", ("beyond-file", FIRST))
     invalid("movie-data-wraps-around.mp4", MEDIA + zulm(sized_atom(b"DATA", 2**64 - 16, LOCATIONS)),
             "the end of the DATA wraps around 64 bits", ("beyond-file", FIRST))
     invalid("movie-zero-size-child.mp4", MEDIA + zulm(data(LOCATIONS), sized_atom(b"DATA", 0)),
             "the second DATA has no size", ("zero-size-child", FIRST + 72))
     invalid("movie-zero-size-child-hides-stream.mp4", MEDIA + zulm(sized_atom(b"free", 0, mark=0), data(LOCATIONS)),
-            "a child without a size hides the stream behind it", ("zero-size-child", FIRST))
+            "a child without a size hides the stream after it", ("zero-size-child", FIRST))
     invalid("movie-foreign-child.mp4", MEDIA + zulm(atom(b"free", b"1234"), data(LOCATIONS)),
             "a child of the ZULM is a free atom", ("foreign-child", FIRST))
     invalid("movie-misspelt-data.mp4", MEDIA + zulm(data(LOCATIONS).replace(b"DATA", b"DAT\xc1"), data(REGIONS)),
@@ -204,9 +204,9 @@ def movies():
     invalid("movie-short-data-header-empty.mp4", MEDIA + zulm(atom(b"DATA"), data(LOCATIONS)),
             "a DATA of 8 bytes holds nothing", ("short-data-header", FIRST), ("short-header", FIRST + 8))
     invalid("movie-data-too-short.mp4", MEDIA + zulm(data(LOCATIONS[:23])),
-            "a DATA of 23 bytes holds no whole stream header", ("short-header", STREAM))
+            "a DATA of 23 bytes is too small for a stream header", ("short-header", STREAM))
     invalid("movie-zulm-trailing-bytes.mp4", MEDIA + zulm(data(LOCATIONS), b"\0\0\0") + atom(b"free", b"1234"),
-            "3 bytes in the ZULM are no atom", ("trailing-bytes", FIRST + 72))
+            "the last 3 bytes in the ZULM are not an atom", ("trailing-bytes", FIRST + 72))
     invalid("movie-zulm-trailing-half-header.mp4", MEDIA + zulm(data(LOCATIONS), be32(1) + b"DATA" + b"\0" * 7),
             "the ZULM ends inside the header of a DATA", ("trailing-bytes", FIRST + 72))
     invalid("movie-short-recording-info.mp4", good + atom(b"ZULR", b"\0" * 63),
@@ -221,40 +221,40 @@ def movies():
 def dropped_tails():
     invalid("movie-dropped-tail.mp4",
             MEDIA + zulm(sized_atom(b"DATA", 16 + 56 + 5, LOCATIONS), data(REGIONS)),
-            "the size of a DATA counts 5 bytes that were not copied, and the stream behind it is lost",
+            "the size of a DATA counts 5 bytes that were not copied, and the stream after it is lost",
             ("dropped-tail", FIRST), ("unreachable-stream", STREAM + 72))
     invalid("movie-dropped-tail-of-text.mp4", MEDIA + zulm(sized_atom(b"DATA", 16 + 56 + 30, APPS), data(REGIONS)),
-            "the same behind a stream of texts", ("dropped-tail", FIRST), ("unreachable-stream", STREAM + 72))
+            "the same after a stream of texts", ("dropped-tail", FIRST), ("unreachable-stream", STREAM + 72))
     invalid("movie-dropped-tail-twice.mp4",
             MEDIA + zulm(sized_atom(b"DATA", 16 + 56 + 5, LOCATIONS), sized_atom(b"DATA", 16 + 56 + 2, APPS),
                          data(REGIONS)),
             "two sizes count bytes that were not copied", ("dropped-tail", FIRST), ("unreachable-stream", STREAM + 72),
             ("dropped-tail", FIRST + 72), ("unreachable-stream", STREAM + 144))
     invalid("movie-dropped-tail-last.mp4", MEDIA + zulm(sized_atom(b"DATA", 16 + 56 + 5, LOCATIONS)) + ZULR,
-            "the last DATA counts 5 bytes of the atom behind the ZULM as its own", ("dropped-tail", FIRST))
+            "the last DATA counts 5 bytes of the atom after the ZULM as its own", ("dropped-tail", FIRST))
 
 
 def riffs():
     good = RIFF + chunk(b"ZULM", chunk(b"DATA", LOCATIONS))
-    invalid("riff-trailing-bytes.wav", good + b"\0\0\0", "3 bytes behind the last chunk are no chunk",
+    invalid("riff-trailing-bytes.wav", good + b"\0\0\0", "the 3 bytes after the last chunk are not a chunk",
             ("trailing-bytes", len(good)))
     invalid("riff-chunk-beyond-file.avi", b"RIFF" + le32(200) + b"AVI JUNKjunk", "the RIFF chunk is cut short",
             ("beyond-file", 0))
     invalid("riff-zero-chunk-hides-metadata.avi", RIFF + chunk(b"JUNK") + good[RIFF_ZULM:],
-            "readers stop at the empty chunk in front of the ZULM", ("zero-size-chunk", RIFF_ZULM))
+            "readers stop at the empty chunk before the ZULM", ("zero-size-chunk", RIFF_ZULM))
     invalid("riff-zero-size-child.avi", RIFF + chunk(b"ZULM", chunk(b"DATA") + chunk(b"DATA", LOCATIONS)),
             "readers stop at the empty DATA", ("zero-size-child", RIFF_FIRST))
     invalid("riff-foreign-child.avi", RIFF + chunk(b"ZULM", chunk(b"JUNK", b"12") + chunk(b"DATA", LOCATIONS)),
             "a child of the ZULM is a JUNK chunk", ("foreign-child", RIFF_FIRST))
     invalid("riff-data-beyond-zulm.wav",
             RIFF + chunk(b"ZULM", b"DATA" + le32(56 + 16) + LOCATIONS) + chunk(b"JUNK", b"0123456789"),
-            "the DATA says one entry more than its ZULM holds", ("beyond-parent", RIFF_FIRST))
+            "the DATA states one entry more than its ZULM holds", ("beyond-parent", RIFF_FIRST))
     invalid("riff-cut-in-entry.wav", good[:-4], "the file was cut short inside an entry", ("beyond-file", RIFF_ZULM),
             ("beyond-file", RIFF_FIRST), ("torn-entry", RIFF_ENTRIES + 16))
     invalid("riff-zulm-trailing-bytes.avi", RIFF + chunk(b"ZULM", chunk(b"DATA", LOCATIONS) + b"DATA"),
-            "4 bytes in the ZULM are no chunk", ("trailing-bytes", RIFF_FIRST + 64))
+            "the last 4 bytes in the ZULM are not a chunk", ("trailing-bytes", RIFF_FIRST + 64))
     invalid("riff-data-too-short.avi", RIFF + chunk(b"ZULM", chunk(b"DATA", LOCATIONS[:10])),
-            "a DATA of 10 bytes holds no whole stream header", ("short-header", RIFF_STREAM))
+            "a DATA of 10 bytes is too small for a stream header", ("short-header", RIFF_STREAM))
     invalid("riff-duplicate-stream.avi", RIFF + chunk(b"ZULM", chunk(b"DATA", LOCATIONS) * 2),
             "two streams are of one kind, and the first is hidden", ("duplicate-stream", RIFF_STREAM + 64))
     invalid("riff-torn-text.wav", RIFF + chunk(b"ZULM", chunk(b"DATA", APPS[:-4])),
@@ -269,7 +269,7 @@ def headers():
     invalid("header-version-negative.dat", header(APP, 0, -1) + text(0.5, b"Abc"), "the version is -1",
             ("bad-version", 16))
     invalid("header-entry-size-0.dat", header(LOCATION, 0) + point(0.5),
-            "locations have a fixed size, but the header says that they vary", ("entry-size-mismatch", 20))
+            "locations have a fixed size, but the header states that they vary", ("entry-size-mismatch", 20))
     invalid("header-entry-size-12.dat", header(LOCATION, 12) + point(0.5), "locations take 16 bytes, not 12",
             ("entry-size-mismatch", 20))
     invalid("header-entry-size-huge.dat", header(REGION, 0xFFFFFFFF) + REGIONS[24:], "regions take 24 bytes, not 4 GiB",
@@ -281,7 +281,7 @@ def headers():
     invalid("header-scale-as-double.dat", header(SCALE, 16) + seconds(0.0) + seconds(2.0),
             "the scale factor is an integer, not a 64-bit float", ("entry-size-mismatch", 20), ("torn-entry", 36))
     invalid("header-unknown-kind-without-time.dat", header(STRANGE, 7) + b"1234567",
-            "entries of 7 bytes, of whatever kind, have no room for their time", ("entry-size-mismatch", 20),
+            "entries of 7 bytes have no space for their time, whatever their kind is", ("entry-size-mismatch", 20),
             ("unknown-kind", 0))
 
 
@@ -293,9 +293,9 @@ def fixed_entries():
     invalid("fixed-torn-only-entry.dat", header(REGION, 24) + b"\0" * 23, "the only region lacks a byte",
             ("torn-entry", 24))
     invalid("fixed-torn-unrecorded-kind.dat", header(CARET, 16) + point(0.5) + b"\0" * 9,
-            "a stream that nobody decodes ends inside an entry", ("torn-entry", 40))
+            "a stream of a kind that is never decoded ends inside an entry", ("torn-entry", 40))
     invalid("fixed-torn-huge-entry.dat", header(STRANGE, 0xFFFFFFFF) + seconds(0.5),
-            "an entry of an unknown kind says 4 GiB", ("torn-entry", 24), ("unknown-kind", 0))
+            "an entry of an unknown kind states a size of 4 GiB", ("torn-entry", 24), ("unknown-kind", 0))
     invalid("time-not-a-number.dat", LOCATIONS + point(NAN), "a time is not a number", ("time-not-finite", 56))
     invalid("time-infinite.dat", header(LOCATION, 16) + point(INFINITY) + point(1.0), "a time is infinite",
             ("time-not-finite", 24))
@@ -310,12 +310,12 @@ def fixed_entries():
 
 def text_entries():
     start = len(APPS)
-    invalid("text-size-0.dat", APPS + text(3.0, b"x", 0), "a text says 0 bytes", ("zero-entry-size", start))
-    invalid("text-size-7.dat", APPS + text(3.0, b"x", 7), "a text says 7 bytes, fewer than its time has",
+    invalid("text-size-0.dat", APPS + text(3.0, b"x", 0), "a text states a size of 0 bytes", ("zero-entry-size", start))
+    invalid("text-size-7.dat", APPS + text(3.0, b"x", 7), "a text states a size of 7 bytes, fewer than its time has",
             ("entry-too-small", start))
-    invalid("text-size-4-gib.dat", APPS + text(3.0, b"x", 0xFFFFFFFF), "a text says 4 GiB",
+    invalid("text-size-4-gib.dat", APPS + text(3.0, b"x", 0xFFFFFFFF), "a text states a size of 4 GiB",
             ("entry-beyond-end", start))
-    invalid("text-size-2-gib.dat", APPS + text(3.0, b"x", 0x80000000), "a text says 2 GiB",
+    invalid("text-size-2-gib.dat", APPS + text(3.0, b"x", 0x80000000), "a text states a size of 2 GiB",
             ("entry-beyond-end", start))
     invalid("text-one-byte-short.dat", APPS + text(3.0, b"Notes")[:-1], "the last text lacks a byte",
             ("entry-beyond-end", start))
@@ -334,23 +334,27 @@ def text_entries():
         invalid(f"text-not-utf8-{name}.dat", header(TITLE, 0) + text(0.5, b"ok") + text(1.0, characters), why,
                 ("not-utf8", 24 + 14 + 12 + bad))
     invalid("text-unknown-kind-size-0.dat", header(STRANGE, 0) + le32(2) + b"ab" + le32(0),
-            "an entry of an unknown kind says 0 bytes", ("zero-entry-size", 30), ("unknown-kind", 0))
+            "an entry of an unknown kind states a size of 0 bytes", ("zero-entry-size", 30), ("unknown-kind", 0))
     invalid("text-unknown-kind-beyond-end.dat", header(STRANGE, 0) + le32(5) + b"ab",
             "an entry of an unknown kind reaches beyond the stream", ("entry-beyond-end", 24), ("unknown-kind", 0))
 
 
 def lists():
     start = header(SYSTEM, 0)
-    invalid("list-total-0.dat", start + texts(SYSTEM_TEXTS, total=0), "a list says 0 bytes", ("zero-entry-size", 24))
-    invalid("list-total-3.dat", start + texts(SYSTEM_TEXTS, total=3), "a list says 3 bytes, fewer than its count has",
+    invalid("list-total-0.dat", start + texts(SYSTEM_TEXTS, total=0),
+            "a list states a size of 0 bytes", ("zero-entry-size", 24))
+    invalid("list-total-3.dat", start + texts(SYSTEM_TEXTS, total=3),
+            "a list states a size of 3 bytes, fewer than its count has",
             ("entry-too-small", 24))
-    invalid("list-total-beyond-end.dat", start + texts(SYSTEM_TEXTS, total=1000), "a list says more than there is",
+    invalid("list-total-beyond-end.dat", start + texts(SYSTEM_TEXTS, total=1000),
+            "a list states a larger size than there is",
             ("entry-beyond-end", 24))
     invalid("list-torn-in-total.dat", start + texts(SYSTEM_TEXTS)[:2], "the stream ends inside a list's total",
             ("torn-entry", 24))
     invalid("list-torn-in-count.dat", start + texts(SYSTEM_TEXTS)[:6], "the stream ends inside a list's count",
             ("torn-entry", 24))
-    invalid("list-count-too-large.dat", start + texts(SYSTEM_TEXTS, count=40), "a list counts 40 texts in room for 8",
+    invalid("list-count-too-large.dat", start + texts(SYSTEM_TEXTS, count=40),
+            "a list counts 40 texts in the space of 8",
             ("list-count", 24))
     invalid("list-count-4-gib.dat", start + texts(SYSTEM_TEXTS, count=0xFFFFFFFF), "a list counts 2^32 - 1 texts",
             ("list-count", 24))
@@ -359,28 +363,31 @@ def lists():
     invalid("list-count-one-more.dat", start + texts(SYSTEM_TEXTS, count=5), "a list counts a fifth text of its 4",
             ("list-total", 24))
     invalid("list-total-too-large.dat", start + texts(SYSTEM_TEXTS, total=4 + sum(map(len, SYSTEM_TEXTS)) + 6) + b"\0" * 6,
-            "a list's total counts 6 bytes behind its last text", ("list-total", 24))
+            "a list's total counts 6 bytes after its last text", ("list-total", 24))
     invalid("list-total-too-small.dat", start + texts(SYSTEM_TEXTS, total=4 + sum(map(len, SYSTEM_TEXTS)) - 2),
-            "a list's total ends inside its last text, and what is left is no list", ("list-total", 24),
+            "a list's total ends inside its last text, and the rest is not a list", ("list-total", 24),
             ("torn-entry", 24 + 8 + sum(map(len, SYSTEM_TEXTS)) - 2))
     invalid("list-text-size-7.dat",
             start + texts([SYSTEM_TEXTS[0], text(0.0, b"x", 7), *SYSTEM_TEXTS[2:]]),
-            "a text in a list says 7 bytes", ("entry-too-small", 24 + 8 + len(SYSTEM_TEXTS[0])))
+            "a text in a list states a size of 7 bytes", ("entry-too-small", 24 + 8 + len(SYSTEM_TEXTS[0])))
     invalid("list-text-size-4-gib.dat", start + texts([*SYSTEM_TEXTS[:3], text(0.0, b"x", 0xFFFFFFFF)]),
-            "a text in a list says 4 GiB", ("list-total", 24))
-    invalid("list-too-few-texts.dat", start + texts(SYSTEM_TEXTS[:3]), "a machine is described by 4 texts, not 3",
+            "a text in a list states a size of 4 GiB", ("list-total", 24))
+    invalid("list-too-few-texts.dat", start + texts(SYSTEM_TEXTS[:3]), "the system data has 3 texts, but needs 4",
             ("too-few-texts", 24))
-    invalid("list-empty.dat", start + texts([]), "a machine is described by no text", ("too-few-texts", 24))
+    invalid("list-empty.dat", start + texts([]), "the system data has no text", ("too-few-texts", 24))
 
 
 def cursors():
     start = header(IMAGE, 0, 2)
     picture = png()
     image = 24 + 36  # where an entry's image is
-    invalid("cursor-size-0.dat", start + cursor(entry_size=0), "a record says 0 bytes", ("zero-entry-size", 24))
-    invalid("cursor-size-19.dat", start + cursor(entry_size=19), "a record says 19 bytes, fewer than its first fields",
+    invalid("cursor-size-0.dat", start + cursor(entry_size=0),
+            "a record states a size of 0 bytes", ("zero-entry-size", 24))
+    invalid("cursor-size-19.dat", start + cursor(entry_size=19),
+            "a record states a size of 19 bytes, fewer than its first fields",
             ("entry-too-small", 24))
-    invalid("cursor-size-beyond-end.dat", start + cursor(entry_size=29), "a record says a byte more than there is",
+    invalid("cursor-size-beyond-end.dat", start + cursor(entry_size=29),
+            "a record states a size that is one byte too large",
             ("entry-beyond-end", 24))
     invalid("cursor-torn.dat", start + cursor() + cursor(picture)[:-4], "the last record lacks its flags",
             ("entry-beyond-end", 56))
@@ -388,24 +395,25 @@ def cursors():
             ("torn-entry", 56))
     invalid("cursor-sizes-disagree.dat", start + cursor(data_size=9) + cursor(), "a record's two sizes differ by one",
             ("cursor-sizes", 24))
-    invalid("cursor-data-size-4-gib.dat", start + cursor(data_size=0xFFFFFFFF), "the data part says 4 GiB",
+    invalid("cursor-data-size-4-gib.dat", start + cursor(data_size=0xFFFFFFFF), "the data part states a size of 4 GiB",
             ("cursor-sizes", 24))
     invalid("cursor-data-empty.dat", start + cursor()[:-8].replace(le32(28), le32(20)).replace(le32(8), le32(0)),
             "the data part of version 2 is empty", ("cursor-data", 24))
     invalid("cursor-without-flags.dat", start + cursor(entry_size=24, data_size=4)[:-4],
-            "the data part ends in front of the flags", ("cursor-data", 24))
+            "the data part ends before the flags", ("cursor-data", 24))
     invalid("cursor-image-beyond-record.dat", start + cursor(picture, image_size=len(picture) + 9),
-            "the image says more than its record holds", ("image-beyond-entry", 24))
-    invalid("cursor-image-4-gib.dat", start + cursor(picture, image_size=0xFFFFFFFF), "the image says 4 GiB",
+            "the image states a larger size than its record", ("image-beyond-entry", 24))
+    invalid("cursor-image-4-gib.dat", start + cursor(picture, image_size=0xFFFFFFFF),
+            "the image states a size of 4 GiB",
             ("image-beyond-entry", 24))
     invalid("cursor-image-takes-the-type.dat", start + cursor(picture, image_size=len(picture) + 6),
-            "the image says 6 bytes more and leaves no room for the cursor's type", ("cursor-data", 24))
+            "the image states a size that is 6 bytes too large and leaves no space for the cursor's type", ("cursor-data", 24))
     invalid("cursor-version-1-half-hot-spot.dat",
             header(IMAGE, 0, 1) + le32(25) + seconds(1.0) + struct.pack("<Q", 7) + le32(5) + b"\0" * 5,
             "the data part of version 1 ends inside its hot spot", ("cursor-data", 24))
-    invalid("cursor-image-is-text.dat", start + cursor(b"not a picture"), "the image is no picture",
+    invalid("cursor-image-is-text.dat", start + cursor(b"not a picture"), "the image is not a picture",
             ("undecodable-image", image))
-    invalid("cursor-image-wrong-sum.dat", start + cursor(png(sum_off_by=1)), "a check sum in the image is wrong",
+    invalid("cursor-image-wrong-sum.dat", start + cursor(png(sum_off_by=1)), "a checksum in the image is wrong",
             ("undecodable-image", image))
     invalid("cursor-image-cut-short.dat", start + cursor(picture[:-16]), "the image lacks its last 16 bytes",
             ("undecodable-image", image))
@@ -415,7 +423,7 @@ def cursors():
             "a TIFF file of 10 bytes has no directory", ("undecodable-image", image))
     invalid("cursor-image-version-1-is-text.dat",
             header(IMAGE, 0, 1) + le32(31) + seconds(1.0) + struct.pack("<Q", 7) + le32(11) + b"\0" * 8 + b"abc",
-            "the image of a version 1 record is no picture", ("undecodable-image", 24 + 32))
+            "the image of a version 1 record is not a picture", ("undecodable-image", 24 + 32))
 
 
 def write_tables():
@@ -424,10 +432,10 @@ def write_tables():
             table.write(name + "\t" + " ".join(f"{code}@{offset}" for code, offset in findings) + "\n")
     with open(os.path.join(HERE, "README.md"), "w", encoding="utf-8") as page:
         page.write("# Invalid recordings\n\n"
-                   f"{len(FILES)} small files, each wrong in one way. `make.py` makes them, this page, and\n"
-                   "`expected.tsv`, from which the tests read what must be found where: first what the file is about,\n"
-                   "then what follows from it. Offsets count from the start of the file.\n\n"
-                   "| file | why it is wrong | finding | offset | and so |\n|---|---|---|---:|---|\n")
+                   f"{len(FILES)} small files, each wrong in one way. `make.py` writes them, this page, and\n"
+                   "`expected.tsv`, which tells the tests what `zulm verify` must find and at which offset from\n"
+                   "the start of the file. The first finding is what the file is about; the others follow from it.\n\n"
+                   "| file | why it is wrong | finding | offset | what follows |\n|---|---|---|---:|---|\n")
         for name, findings, why in FILES:
             (code, offset), rest = findings[0], findings[1:]
             consequences = ", ".join(f"{c} at {o}" for c, o in rest)
