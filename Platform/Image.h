@@ -4,7 +4,7 @@
 // back. Everything happens in memory. What a codec cannot read or write is "no image", without a message; only
 // std::bad_alloc, where memory ends, leaves these functions as an exception.
 
-#include "SharedDependencies/Export.h"
+#include "../SharedDependencies/Export.h"
 
 #include <cstdint>
 #include <optional>

@@ -2,7 +2,7 @@
 
 // The machine and the operating system that this process runs on.
 
-#include "SharedDependencies/Export.h"
+#include "../SharedDependencies/Export.h"
 
 #include <cstdint>
 #include <string>

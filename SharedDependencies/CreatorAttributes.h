@@ -2,7 +2,7 @@
 
 // Who made a recording: the 56-byte creator record of a movie's recording info.
 
-#include "SharedDependencies/Export.h"
+#include "Export.h"
 
 #include <cstddef>
 #include <string>

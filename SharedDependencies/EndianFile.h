@@ -3,7 +3,7 @@
 // Opening files the way the whole library does, and the byte order and position
 // helpers that its containers need.
 
-#include "SharedDependencies/Export.h"
+#include "Export.h"
 
 #include <cstdint>
 #include <fstream>

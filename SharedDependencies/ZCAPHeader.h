@@ -2,7 +2,7 @@
 
 // The 64-byte recording info that a movie carries in its `ZULR` atom.
 
-#include "SharedDependencies/CreatorAttributes.h"
+#include "CreatorAttributes.h"
 
 #include <cstdint>
 #include <type_traits>

@@ -3,8 +3,8 @@
 // The atoms of a movie or the chunks of a RIFF file as their headers declare them, for tools that show or check a
 // container. Nothing between the headers is read.
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataParser.h"
+#include "../SharedDependencies/Export.h"
+#include "ZULMMetaDataParser.h"
 
 #include <cstdint>
 #include <functional>

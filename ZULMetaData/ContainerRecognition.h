@@ -2,8 +2,8 @@
 
 // Tells containers apart by their first bytes, for input that has no file name.
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataParser.h"
+#include "../SharedDependencies/Export.h"
+#include "ZULMMetaDataParser.h"
 
 #include <string_view>
 

@@ -4,8 +4,8 @@
 // part. A step says for which stream versions its field exists, when it is present, and where its bytes lie in
 // memory. A later version appends steps; older readers skip what they do not know.
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataCommon.h"
+#include "../SharedDependencies/Export.h"
+#include "ZULMMetaDataCommon.h"
 
 #include <cstdint>
 #include <span>

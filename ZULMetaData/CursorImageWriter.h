@@ -6,8 +6,8 @@
 //     4   timestamp                 24  imageSizeV2 = n             36      imageData
 //     12  cursorID                  28  hotspotX                    36 + n  cursorType, 40 + n cursorFlags
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/CursorImageSchema.h"
+#include "../SharedDependencies/Export.h"
+#include "CursorImageSchema.h"
 
 #include <cstdint>
 #include <iosfwd>

@@ -1,7 +1,7 @@
 #pragma once
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataParser.h"
+#include "../SharedDependencies/Export.h"
+#include "ZULMMetaDataParser.h"
 
 #include <optional>
 

@@ -6,7 +6,7 @@
 // Mended are a last atom with an open end, an append that was interrupted, and a movie that
 // `Util::finalizeAtomsInFile` left 8 bytes short. Nothing is changed where two readings are possible.
 
-#include "SharedDependencies/Export.h"
+#include "../SharedDependencies/Export.h"
 
 #include <cstdint>
 #include <istream>

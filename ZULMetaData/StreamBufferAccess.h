@@ -4,7 +4,7 @@
 // of `write` or `read` on a stream costs five to twenty times as much as the 16 bytes of an entry that it moves.
 // The streams stay usable by anybody in between, for the areas are always left as the buffer itself would leave them.
 
-#include "SharedDependencies/Export.h"
+#include "../SharedDependencies/Export.h"
 
 #include <cstddef>
 #include <cstring>

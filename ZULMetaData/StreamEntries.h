@@ -8,10 +8,10 @@
 //         if (const auto decoded = decodeEntry<std::string>(entries.bytesOf(*entry), entries.header()->version))
 //             std::cout << decoded->time << ' ' << decoded->value << '\n';
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/StreamExtent.h"
-#include "ZULMetaData/ZULMMetaDataReader.h"
-#include "ZULMetaData/ZULMMetaDataUUIDs.h"
+#include "../SharedDependencies/Export.h"
+#include "StreamExtent.h"
+#include "ZULMMetaDataReader.h"
+#include "ZULMMetaDataUUIDs.h"
 
 #include <cstdint>
 #include <optional>

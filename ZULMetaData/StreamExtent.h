@@ -3,8 +3,8 @@
 // How much of a metadata stream is whole: its header and the entries in front of the first one that is cut short.
 // Bounded by the bytes that are there, whatever sizes they declare, and in constant memory.
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataUUIDs.h"
+#include "../SharedDependencies/Export.h"
+#include "ZULMMetaDataUUIDs.h"
 
 #include <cstddef>
 #include <cstdint>

@@ -3,8 +3,8 @@
 // The values that metadata streams carry, and the identifier that names each kind of stream.
 // The fixed-size values are stored as they lie in memory: the order and width of their fields is a file format.
 
-#include "SharedDependencies/EndianFile.h"
-#include "SharedDependencies/Export.h"
+#include "../SharedDependencies/EndianFile.h"
+#include "../SharedDependencies/Export.h"
 
 #include <bit>
 #include <compare>

@@ -5,8 +5,8 @@
 //     if (const auto parser = MetaDataParser::create("Recording.mp4"))
 //         parser->loadDataType<Point>(s_cursorLocationUUID, observer, -1);
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataReader.h"
+#include "../SharedDependencies/Export.h"
+#include "ZULMMetaDataReader.h"
 
 #include <cstdint>
 #include <istream>

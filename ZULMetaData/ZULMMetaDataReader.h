@@ -7,12 +7,12 @@
 //     } printer;
 //     MetaDataReader<Point>::parseStream(printer, file, 0, fileSize, -1);
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/CursorImageWriter.h"
-#include "ZULMetaData/InvalidEntry.h"
-#include "ZULMetaData/StreamBufferAccess.h"
-#include "ZULMetaData/ZULMMetaDataCommon.h"
-#include "ZULMetaData/ZULMMetaDataUUIDs.h"
+#include "../SharedDependencies/Export.h"
+#include "CursorImageWriter.h"
+#include "InvalidEntry.h"
+#include "StreamBufferAccess.h"
+#include "ZULMMetaDataCommon.h"
+#include "ZULMMetaDataUUIDs.h"
 
 #include <algorithm>
 #include <array>

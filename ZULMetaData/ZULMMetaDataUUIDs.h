@@ -2,8 +2,8 @@
 
 // The header in front of every metadata stream, and the registry of the kinds of streams.
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataCommon.h"
+#include "../SharedDependencies/Export.h"
+#include "ZULMMetaDataCommon.h"
 
 #include <array>
 #include <cstddef>

@@ -7,12 +7,12 @@
 //     writer.write(0.25, Point(10, -4), true);
 //     writer.close();
 
-#include "SharedDependencies/EndianFile.h"
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/CursorImageWriter.h"
-#include "ZULMetaData/StreamBufferAccess.h"
-#include "ZULMetaData/ZULMMetaDataCommon.h"
-#include "ZULMetaData/ZULMMetaDataUUIDs.h"
+#include "../SharedDependencies/EndianFile.h"
+#include "../SharedDependencies/Export.h"
+#include "CursorImageWriter.h"
+#include "StreamBufferAccess.h"
+#include "ZULMMetaDataCommon.h"
+#include "ZULMMetaDataUUIDs.h"
 
 #include <array>
 #include <cstdint>

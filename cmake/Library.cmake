@@ -11,6 +11,8 @@ function(zulm_library target name)
     SOVERSION ${ZULMETADATA_ABI_VERSION}
     CXX_VISIBILITY_PRESET hidden
     VISIBILITY_INLINES_HIDDEN ON)
+  # A project around this one may have folders of the same names on its own list.
+  target_include_directories(${target} BEFORE PRIVATE ${PROJECT_SOURCE_DIR})
   get_target_property(type ${target} TYPE)
   if(type STREQUAL "STATIC_LIBRARY")
     target_compile_definitions(${target} PUBLIC ZULMETADATA_STATIC)

@@ -3,6 +3,7 @@
 Usage: check_includes.py [FOLDER]; FOLDER is the project's folder, by default the one that this script belongs to.
 """
 
+import os
 import pathlib
 import re
 import sys
@@ -42,6 +43,17 @@ def installed_headers(root):
     return headers
 
 
+def quoted_file(root, file, name, installed):
+    """Returns the file of this project that an include in quotes names, or None.
+
+    Installed headers name each other by relative paths. A compiler looks next to the including file first, so an
+    application's own folder `Platform` is never searched for them. Other files use paths from the project's folder.
+    """
+    is_installed = str(file.relative_to(root)) in installed
+    found = pathlib.Path(os.path.normpath((file.parent if is_installed else root) / name))
+    return str(found.relative_to(root)) if found.is_file() and found.is_relative_to(root) else None
+
+
 def complaints_about(root, file, folder, below, installed):
     text = file.read_text(encoding="utf-8")
     path = str(file.relative_to(root))
@@ -52,11 +64,15 @@ def complaints_about(root, file, folder, below, installed):
             for pattern, user in ONE_FOLDER_ONLY.items():
                 if re.match(pattern, name) and not path.startswith(user + "/"):
                     yield f"<{name}> may be included in {user} only"
-        elif not (root / name).is_file():
+            continue
+        included = quoted_file(root, file, name, installed)
+        if included is None and path in installed:
+            yield f'"{name}" is not a path from this installed header to another header of this project'
+        elif included is None:
             yield f'"{name}" is not a file of this project'
-        elif name.split("/")[0] not in [folder, *below]:
+        elif included.split("/")[0] not in [folder, *below]:
             yield f'"{name}" is not below {folder}'
-        elif path in installed and name not in installed:
+        elif path in installed and included not in installed:
             yield f'"{name}" is not installed, but this header is'
     if folder in STANDARD_ONLY and SYSTEM.search(text):
         yield "it has a condition on the operating system; move that to Platform"
@@ -92,7 +108,7 @@ def main():
                 continue
             path = str(file.relative_to(root))
             names = INCLUDE.findall(file.read_text(encoding="utf-8"))
-            included[path] = [name for kind, name in names if kind == '"']
+            included[path] = [quoted_file(root, file, name, installed) for kind, name in names if kind == '"']
             complaints += [f"{path}: {text}" for text in complaints_about(root, file, folder, below[folder], installed)]
     complaints += [f"{way[0]}: includes itself through {', '.join(way[1:-1])}" for way in circles(included)]
     print(*complaints, sep="\n", end="\n" if complaints else "")

@@ -6,7 +6,7 @@ set -euo pipefail
 
 build=(g++ cmake ninja-build ccache libpng-dev libtiff-dev libcli11-dev nlohmann-json3-dev libfmt-dev libre2-dev)
 media=(ffmpeg)
-test=(libgtest-dev libgmock-dev imagemagick pngcheck libimage-exiftool-perl mediainfo groff-base python3-jsonschema zsh fish)
+test=(libgtest-dev libgmock-dev libx11-dev imagemagick pngcheck libimage-exiftool-perl mediainfo groff-base python3-jsonschema zsh fish)
 consumers=(clang make pkg-config binutils)
 python=(python3-dev python3-numpy python3-pybind11 pybind11-dev python3-pip python3-setuptools python3-wheel python3-pytest
     python3-matplotlib mypy)

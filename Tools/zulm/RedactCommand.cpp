@@ -73,7 +73,7 @@ void requireSameContainer(const InputFile& input, const std::string& output) {
 
 const char* removalText(RedactedStream::Removal removal) {
     switch (removal) {
-    case RedactedStream::None: return "kept";
+    case RedactedStream::Kept: return "kept";
     case RedactedStream::Asked: return "removed";
     case RedactedStream::Undecodable: return "removed: its entries cannot be looked into";
     default: return "removed: it has no whole header";
@@ -82,7 +82,7 @@ const char* removalText(RedactedStream::Removal removal) {
 
 bool isLoss(const RedactedStream& stream) {
     return stream.bytesLeftOut > 0 ||
-           (stream.removal != RedactedStream::None && stream.removal != RedactedStream::Asked);
+           (stream.removal != RedactedStream::Kept && stream.removal != RedactedStream::Asked);
 }
 
 ExitCode complainAboutWhatIsLeftOut(const std::string& name, const RedactedCopy& copy) {
@@ -117,7 +117,7 @@ ExitCode complainAboutDamage(const std::string& path, const std::string& output)
 Json streamDocument(const RedactedStream& stream) {
     return {{"kind", kindDocument(stream.header.uuid)},
             {"uuid", uuidText(stream.header.uuid)},
-            {"removed", stream.removal != RedactedStream::None},
+            {"removed", stream.removal != RedactedStream::Kept},
             {"status", removalText(stream.removal)},
             {"entries", stream.entries},
             {"entries_changed", stream.entriesChanged},
@@ -139,7 +139,7 @@ void print(const RedactOptions& options, const RedactedCopy& copy) {
     writeOutput(fmt::format("{}: written\n", options.output));
     for (const RedactedStream& stream : copy.streams()) {
         const std::string name = metaDataKindName(stream.header.uuid);
-        if (stream.removal != RedactedStream::None)
+        if (stream.removal != RedactedStream::Kept)
             writeOutput(fmt::format("  {:<23}  {}\n", name, removalText(stream.removal)));
         else
             writeOutput(fmt::format("  {:<23}  {} left, {} of them changed; {} removed\n", name, stream.entries,
@@ -158,7 +158,7 @@ ExitCode runRedact(const RedactOptions& options) {
     RedactedCopy copy(recording, redaction);
     copy.write(output.temporaryPath(), options.output);
     const bool isEmptyStream = recording.parser().getStreamType() == MetaDataParser::RawStream &&
-                               copy.streams().front().removal != RedactedStream::None;
+                               copy.streams().front().removal != RedactedStream::Kept;
     if (isEmptyStream)
         throw Failure(fmt::format("{}: nothing would be left of it ({}); nothing was written", input.name(),
                                   removalText(copy.streams().front().removal)));

@@ -162,7 +162,7 @@ void RedactedCopy::writeStreams(const std::string& file) {
         stream.bytesLeftOut += held.declared - held.present;
         stream.header.uuid = held.type;
         streams_.push_back(stream);
-        if (stream.removal == RedactedStream::None)
+        if (stream.removal == RedactedStream::Kept)
             parts_.push_back({begin, sizeOf(output, name_) - begin});
     }
     finish(output, file, name_);

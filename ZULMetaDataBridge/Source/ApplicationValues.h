@@ -3,7 +3,7 @@
 // What an application hands to the writers: times, points and rectangles in its own terms. The platform's own
 // records convert to these by their shape, so that none of its headers is needed here.
 
-#include "ZULMetaData/ZULMMetaDataCommon.h"
+#include "../../ZULMetaData/ZULMMetaDataCommon.h"
 
 #include <cmath>
 #include <concepts>

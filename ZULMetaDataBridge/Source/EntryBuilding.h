@@ -2,8 +2,8 @@
 
 // Turns decoded values into entries, by the fields of their kind.
 
-#include "ZULMetaDataBridge/Source/EntryDictionary.h"
-#include "ZULMetaDataBridge/Source/MetaDataKinds.h"
+#include "EntryDictionary.h"
+#include "MetaDataKinds.h"
 
 #include <concepts>
 #include <cstdint>

@@ -5,7 +5,7 @@
 //     for (const EntryDictionary& entry : *parser.read())
 //         std::cout << entry.get<std::int32_t>("x") << " at " << entry.get<float>("timestamp") << '\n';
 
-#include "SharedDependencies/Export.h"
+#include "../../SharedDependencies/Export.h"
 
 #include <array>
 #include <atomic>

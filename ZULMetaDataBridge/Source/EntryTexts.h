@@ -2,7 +2,7 @@
 
 // Stored bytes as texts for the application.
 
-#include "SharedDependencies/Export.h"
+#include "../../SharedDependencies/Export.h"
 
 #include <cstddef>
 #include <string>

@@ -2,7 +2,7 @@
 
 // Texts for recorded input actions, such as "left down + shift" or "<Shift><Cmd>".
 
-#include "SharedDependencies/Export.h"
+#include "../../SharedDependencies/Export.h"
 
 #include <string>
 

@@ -2,9 +2,9 @@
 
 // What the kind of a stream tells about its entries, for code that handles streams of any kind.
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/StreamEntries.h"
-#include "ZULMetaDataBridge/Source/MetaDataKinds.h"
+#include "../../SharedDependencies/Export.h"
+#include "../../ZULMetaData/StreamEntries.h"
+#include "MetaDataKinds.h"
 
 #include <cstdint>
 #include <optional>

@@ -3,12 +3,12 @@
 // What is peculiar to each kind of metadata that the application records and reads: the value its entries hold,
 // the identifier and version of its stream, and the keys under which its entries are read back.
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataCommon.h"
-#include "ZULMetaData/ZULMMetaDataUUIDs.h"
-#include "ZULMetaDataBridge/Source/EntryDictionary.h"
-#include "ZULMetaDataBridge/Source/EntryTexts.h"
-#include "ZULMetaDataBridge/Source/HumanReadableActions.h"
+#include "../../SharedDependencies/Export.h"
+#include "../../ZULMetaData/ZULMMetaDataCommon.h"
+#include "../../ZULMetaData/ZULMMetaDataUUIDs.h"
+#include "EntryDictionary.h"
+#include "EntryTexts.h"
+#include "HumanReadableActions.h"
 
 #include <cstdint>
 #include <functional>

@@ -7,9 +7,9 @@
 //     for (const Finding& finding : validateRecording("Recording.mp4").allFindings())
 //         std::cerr << finding.offset << ": " << finding.sentence << '\n';
 
-#include "Platform/FileLocation.h"
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataParser.h"
+#include "../../Platform/FileLocation.h"
+#include "../../SharedDependencies/Export.h"
+#include "../../ZULMetaData/ZULMMetaDataParser.h"
 
 #include <array>
 #include <cstddef>

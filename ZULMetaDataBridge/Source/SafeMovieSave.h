@@ -6,12 +6,12 @@
 //     for (const AttachedStream& stream : saved.streams)
 //         std::cout << stream.name << ": " << stream.entries << " entries, " << stream.bytesCut << " bytes cut off\n";
 
-#include "Platform/FileLocation.h"
-#include "SharedDependencies/Export.h"
-#include "SharedDependencies/ZCAPHeader.h"
-#include "ZULMetaData/RepairPlan.h"
-#include "ZULMetaData/StreamExtent.h"
-#include "ZULMetaDataBridge/Source/StreamSource.h"
+#include "../../Platform/FileLocation.h"
+#include "../../SharedDependencies/Export.h"
+#include "../../SharedDependencies/ZCAPHeader.h"
+#include "../../ZULMetaData/RepairPlan.h"
+#include "../../ZULMetaData/StreamExtent.h"
+#include "StreamSource.h"
 
 #include <cstdint>
 #include <functional>

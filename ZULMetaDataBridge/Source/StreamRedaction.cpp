@@ -71,7 +71,7 @@ RedactedStream::Removal removalOf(const std::optional<MetaDataHeader>& header, c
     if (redaction.removedKinds.contains(header->uuid))
         return RedactedStream::Asked;
     const bool isLegible = isDecodable(*header) || !mustLookInto(redaction, header->uuid);
-    return isLegible ? RedactedStream::None : RedactedStream::Undecodable;
+    return isLegible ? RedactedStream::Kept : RedactedStream::Undecodable;
 }
 
 void writeHeader(MetaDataHeader header, std::ostream& out) {
@@ -95,7 +95,7 @@ RedactedStream redactStream(const StreamSource::Bytes& stream, const Redaction& 
     StreamEntries entries = entriesOf(stream.read, stream.length);
     result.header = entries.header().value_or(MetaDataHeader());
     result.removal = removalOf(entries.header(), redaction);
-    if (result.removal != RedactedStream::None)
+    if (result.removal != RedactedStream::Kept)
         return result;
     writeHeader(result.header, out);
     std::uint64_t end = s_metaDataHeaderSize;

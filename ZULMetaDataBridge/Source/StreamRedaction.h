@@ -7,9 +7,9 @@
 //     std::ofstream copy("keyboardAction.dat", std::ios::binary);
 //     redactStream(StreamSource::file("private/keyboardAction.dat").open(), redaction, copy);
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataUUIDs.h"
-#include "ZULMetaDataBridge/Source/StreamSource.h"
+#include "../../SharedDependencies/Export.h"
+#include "../../ZULMetaData/ZULMMetaDataUUIDs.h"
+#include "StreamSource.h"
 
 #include <cstdint>
 #include <functional>
@@ -48,14 +48,14 @@ struct Redaction {
 struct RedactedStream {
     /// Why it is not in the copy.
     enum Removal : std::int32_t {
-        None,
+        Kept, ///< it is in the copy
         Asked,
         Undecodable, ///< of a kind or version that cannot be looked into, though something in it might have to go
         Headless,    ///< too short for a stream's header
     };
 
     MetaDataHeader header;            ///< of the original; without a kind where it has none
-    Removal removal = None;           ///< `None` for a stream that was copied
+    Removal removal = Kept;           ///< why the stream is not in the copy
     std::uint64_t entries = 0;        ///< in the copy
     std::uint64_t entriesRemoved = 0; ///< for their times
     std::uint64_t entriesChanged = 0; ///< of those in the copy

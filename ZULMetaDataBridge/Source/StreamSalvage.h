@@ -8,9 +8,9 @@
 //     for (const SalvagedStream& stream : salvage.run().streams)
 //         std::cout << stream.header.uuid << " at " << stream.offset << ": " << stream.entries << " entries\n";
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/StreamEntries.h"
-#include "ZULMetaData/ZULMMetaDataParser.h"
+#include "../../SharedDependencies/Export.h"
+#include "../../ZULMetaData/StreamEntries.h"
+#include "../../ZULMetaData/ZULMMetaDataParser.h"
 
 #include <cstddef>
 #include <cstdint>

@@ -3,9 +3,9 @@
 // One metadata stream that is to go into a movie, wherever its bytes are: in a stream file, inside another recording,
 // or in memory.
 
-#include "Platform/FileLocation.h"
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/StreamExtent.h"
+#include "../../Platform/FileLocation.h"
+#include "../../SharedDependencies/Export.h"
+#include "../../ZULMetaData/StreamExtent.h"
 
 #include <cstdint>
 #include <functional>

@@ -1,7 +1,7 @@
 #pragma once
 
-#include "Platform/FileLocation.h"
-#include "SharedDependencies/Export.h"
+#include "../../Platform/FileLocation.h"
+#include "../../SharedDependencies/Export.h"
 
 namespace ZULMetaData {
 

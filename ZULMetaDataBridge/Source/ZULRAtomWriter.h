@@ -1,8 +1,8 @@
 #pragma once
 
-#include "Platform/FileLocation.h"
-#include "SharedDependencies/Export.h"
-#include "SharedDependencies/ZCAPHeader.h"
+#include "../../Platform/FileLocation.h"
+#include "../../SharedDependencies/Export.h"
+#include "../../SharedDependencies/ZCAPHeader.h"
 
 #include <string>
 

@@ -2,9 +2,9 @@
 
 // What every parser of the family shares: the location of its file, and how a stream is copied out of it.
 
-#include "Platform/FileLocation.h"
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataCommon.h"
+#include "../../../Platform/FileLocation.h"
+#include "../../../SharedDependencies/Export.h"
+#include "../../../ZULMetaData/ZULMMetaDataCommon.h"
 
 #include <memory>
 #include <sstream>

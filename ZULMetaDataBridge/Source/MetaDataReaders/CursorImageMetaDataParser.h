@@ -1,7 +1,7 @@
 #pragma once
 
-#include "Platform/Image.h"
-#include "ZULMetaDataBridge/Source/MetaDataReaders/KindMetaDataParser.h"
+#include "../../../Platform/Image.h"
+#include "KindMetaDataParser.h"
 
 namespace ZULMetaData {
 

@@ -2,12 +2,12 @@
 
 // The mechanism of the parser family. A class of the family adds the name of its list.
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataParser.h"
-#include "ZULMetaDataBridge/Source/EntryBuilding.h"
-#include "ZULMetaDataBridge/Source/MetaDataKinds.h"
-#include "ZULMetaDataBridge/Source/MetaDataReaders/BaseMetaDataParser.h"
-#include "ZULMetaDataBridge/Source/MetaDataReaders/MetaDataObserver.h"
+#include "../../../SharedDependencies/Export.h"
+#include "../../../ZULMetaData/ZULMMetaDataParser.h"
+#include "../EntryBuilding.h"
+#include "../MetaDataKinds.h"
+#include "BaseMetaDataParser.h"
+#include "MetaDataObserver.h"
 
 #include <cstddef>
 #include <memory>

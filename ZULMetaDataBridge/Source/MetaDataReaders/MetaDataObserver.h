@@ -1,7 +1,7 @@
 #pragma once
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataReader.h"
+#include "../../../SharedDependencies/Export.h"
+#include "../../../ZULMetaData/ZULMMetaDataReader.h"
 
 #include <vector>
 

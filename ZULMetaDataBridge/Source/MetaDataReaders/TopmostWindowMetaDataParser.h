@@ -1,6 +1,6 @@
 #pragma once
 
-#include "ZULMetaDataBridge/Source/MetaDataReaders/KindMetaDataParser.h"
+#include "KindMetaDataParser.h"
 
 namespace ZULMetaData {
 

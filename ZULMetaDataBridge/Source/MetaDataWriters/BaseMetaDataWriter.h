@@ -2,8 +2,8 @@
 
 // What every writer of the family shares: the location of its stream file.
 
-#include "Platform/FileLocation.h"
-#include "SharedDependencies/Export.h"
+#include "../../../Platform/FileLocation.h"
+#include "../../../SharedDependencies/Export.h"
 
 #include <cstdint>
 

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "SharedDependencies/Export.h"
+#include "../../../SharedDependencies/Export.h"
 
 namespace ZULMetaData {
 

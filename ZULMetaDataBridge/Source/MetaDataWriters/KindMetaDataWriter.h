@@ -3,12 +3,12 @@
 // The mechanism of the writer family: how a stream writer is created and released, and the three ways of writing.
 // A class of the family adds what is peculiar to its kind.
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ZULMMetaDataWriter.h"
-#include "ZULMetaDataBridge/Source/ApplicationValues.h"
-#include "ZULMetaDataBridge/Source/MetaDataKinds.h"
-#include "ZULMetaDataBridge/Source/MetaDataWriters/BaseMetaDataWriter.h"
-#include "ZULMetaDataBridge/Source/MetaDataWriters/KeptReachable.h"
+#include "../../../SharedDependencies/Export.h"
+#include "../../../ZULMetaData/ZULMMetaDataWriter.h"
+#include "../ApplicationValues.h"
+#include "../MetaDataKinds.h"
+#include "BaseMetaDataWriter.h"
+#include "KeptReachable.h"
 
 #include <cstdint>
 #include <memory>

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+#include "KindMetaDataWriter.h"
 
 namespace ZULMetaData {
 

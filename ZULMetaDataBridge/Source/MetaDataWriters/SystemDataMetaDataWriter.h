@@ -1,8 +1,8 @@
 #pragma once
 
-#include "Platform/ProcessInfo.h"
-#include "SharedDependencies/Export.h"
-#include "ZULMetaDataBridge/Source/MetaDataWriters/KindMetaDataWriter.h"
+#include "../../../Platform/ProcessInfo.h"
+#include "../../../SharedDependencies/Export.h"
+#include "KindMetaDataWriter.h"
 
 #include <list>
 #include <string>

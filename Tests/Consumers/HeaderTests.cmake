@@ -1,0 +1,27 @@
+# What applications do with the installed headers, tried with the headers and the library of this build.
+if(CMAKE_SYSTEM_NAME STREQUAL "Linux")
+  find_path(XLIB_HEADERS X11/Xlib.h REQUIRED)
+  mark_as_advanced(XLIB_HEADERS)
+
+  # A header that includes every installed one, by a path on which no folder of an application lies.
+  get_target_property(installed_headers ZULMetaData HEADER_SET)
+  get_target_property(bridge_headers ZULMetaDataBridge HEADER_SET)
+  list(APPEND installed_headers ${bridge_headers})
+  set(own_folders ${CMAKE_CURRENT_LIST_DIR}/own_folders)
+  set(includes "")
+  foreach(header IN LISTS installed_headers)
+    cmake_path(RELATIVE_PATH header BASE_DIRECTORY ${PROJECT_SOURCE_DIR} OUTPUT_VARIABLE name)
+    if(name MATCHES "^(Platform|SharedDependencies)/" AND NOT EXISTS ${own_folders}/${name})
+      message(SEND_ERROR "${own_folders} needs a header ${name}, so that the tests notice who includes it")
+    endif()
+    string(APPEND includes "#include \"${header}\"\n")
+  endforeach()
+  set(generated ${CMAKE_CURRENT_BINARY_DIR}/Consumers)
+  file(CONFIGURE OUTPUT ${generated}/installed_headers.h CONTENT "#pragma once\n@includes@" @ONLY)
+
+  add_executable(crowded_application ${CMAKE_CURRENT_LIST_DIR}/crowded_application.cpp)
+  target_include_directories(crowded_application BEFORE PRIVATE ${own_folders} PRIVATE ${generated} ${XLIB_HEADERS})
+  target_link_libraries(crowded_application PRIVATE ZULMetaData::Bridge)
+  zulm_project_options(crowded_application)
+  add_test(NAME Consumers/crowded_application COMMAND crowded_application)
+endif()
