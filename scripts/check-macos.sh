@@ -21,7 +21,7 @@ link_headers() {
     local name
     mkdir -p "$dependencies/include"
     for name in png.h pngconf.h pnglibconf.h tiff.h tiffio.h tiffvers.h tiffconf.h zlib.h zconf.h \
-        CLI fmt nlohmann re2; do
+        CLI fmt nlohmann re2 utf8proc.h; do
         ln -sfn "$(find /usr/include "/usr/include/$(uname -m)-linux-gnu" -maxdepth 1 -name "$name" | head -1)" \
             "$dependencies/include/$name"
     done
@@ -45,7 +45,7 @@ stub() {
 
 install_compiler
 link_headers
-for library in libpng libtiff libre2; do stub $library; done
+for library in libpng libtiff libre2 libutf8proc; do stub $library; done
 
 mapfile -t examples < <(basename -s .cpp Examples/*.cpp)
 for processor in aarch64 x86_64; do

@@ -4,7 +4,8 @@
 # shellcheck disable=SC2034 # groups are used by their names
 set -euo pipefail
 
-build=(g++ cmake ninja-build ccache libpng-dev libtiff-dev libcli11-dev nlohmann-json3-dev libfmt-dev libre2-dev)
+build=(g++ cmake ninja-build ccache libpng-dev libtiff-dev libcli11-dev nlohmann-json3-dev libfmt-dev libre2-dev
+    libutf8proc-dev)
 media=(ffmpeg)
 test=(libgtest-dev libgmock-dev libx11-dev imagemagick pngcheck libimage-exiftool-perl mediainfo groff-base python3-jsonschema zsh fish)
 consumers=(clang make pkg-config binutils)
@@ -19,7 +20,8 @@ bench=(mediainfo)
 reliability=(python3 valgrind strace)
 coverage=(gcovr)
 libcxx=(clang libc++-dev libc++abi-dev googletest)
-arm64=(g++-aarch64-linux-gnu qemu-user googletest libpng-dev:arm64 libtiff-dev:arm64 libfmt-dev:arm64 libre2-dev:arm64)
+arm64=(g++-aarch64-linux-gnu qemu-user googletest libpng-dev:arm64 libtiff-dev:arm64 libfmt-dev:arm64 libre2-dev:arm64
+    libutf8proc-dev:arm64)
 macos=(binutils file)
 viewer=(emscripten nodejs)
 browser=(chromium fonts-dejavu-core fonts-inter fonts-liberation fonts-noto-color-emoji fonts-wqy-microhei)

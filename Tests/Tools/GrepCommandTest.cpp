@@ -49,6 +49,18 @@ TEST_F(GrepCommand, IgnoresCaseAndTakesFixedTextsWhereAsked) {
     EXPECT_EQ(runTool({"grep", "-i", "-F", "A.C", file}).exitCode, 0);
 }
 
+TEST_F(GrepCommand, FindsATextInEveryNormalForm) {
+    const std::string joined = "Caf\xc3\xa9 \xc3\x85";        // NFC
+    const std::string apart = "Cafe\xcc\x81 A\xcc\x8a";       // NFD
+    const std::string angstrom = "Cafe\xcc\x81 \xe2\x84\xab"; // of neither form
+    for (const std::string& stored : {joined, apart, angstrom})
+        for (const std::string& pattern : {joined, apart, angstrom})
+            EXPECT_EQ(runTool({"grep", "-F", pattern, named(stored)}).exitCode, 0) << stored << " by " << pattern;
+    EXPECT_EQ(runTool({"grep", "f[\xc3\xa9x]", named(apart)}).exitCode, 0);
+    EXPECT_EQ(runTool({"grep", "e\\x{301}", named(apart)}).exitCode, 0) << "as it is stored";
+    EXPECT_EQ(runTool({"grep", "Cafe ", named(joined)}).exitCode, 4);
+}
+
 TEST_F(GrepCommand, SearchesEveryKindOfTextInARecording) {
     const std::string output = runTool({"grep", ".", movie()}).output;
     for (const char* kind : {"slideTitles", "slideText", "slideComment", "topmostAppName", "topmostWindowTitle"})

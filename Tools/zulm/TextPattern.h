@@ -8,16 +8,21 @@ namespace Zulm {
 class Expression;
 
 /// A regular expression that is looked for in texts, in time that grows with the text alone, whatever the expression.
+/// A text matches whichever canonical normal form of Unicode it and the expression are written in.
 class TextPattern {
 public:
     /// Throws the usage error for what is no expression. `isFixed` takes every character for itself.
     TextPattern(const std::string& pattern, bool ignoreCase, bool isFixed);
 
-    /// Whether it is anywhere in `text`, which is UTF-8.
+    /// Returns whether the expression is found anywhere in `text`, which is UTF-8.
     bool matches(const std::string& text) const;
 
 private:
-    std::unique_ptr<Expression, void (*)(Expression*) noexcept> expression_;
+    using ExpressionOwner = std::unique_ptr<Expression, void (*)(Expression*) noexcept>;
+
+    ExpressionOwner expression_; ///< as it was given
+    ExpressionOwner composed_;   ///< in the normal form NFC
+    bool isComposed_;            ///< both are the same
 };
 
 } // namespace Zulm

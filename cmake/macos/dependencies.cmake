@@ -15,3 +15,4 @@ target_compile_definitions(fmt::fmt-header-only INTERFACE FMT_HEADER_ONLY=1)
 
 set(ZULMETADATA_FMT_TARGET fmt::fmt-header-only)
 set(RE2_LIBRARY ${ZULM_MACOS_DEPENDENCIES}/lib/libre2.tbd)
+set(UTF8PROC_LIBRARY ${ZULM_MACOS_DEPENDENCIES}/lib/libutf8proc.tbd)
