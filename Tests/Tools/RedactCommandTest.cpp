@@ -7,6 +7,8 @@
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
+#include <cmath>
+
 namespace ZULMetaData::Test {
 namespace {
 
@@ -49,6 +51,11 @@ std::string hiddenNames() {
     return streamHeader(s_appNames, 1, 0) + textEntry(0.5, "Abc") + textEntry(2.0, s_ellipsis);
 }
 
+/// The stream of locations, from what was in force at the end of a range on.
+std::string carriedTo(double end, std::int32_t x, std::int32_t y) {
+    return streamHeader(s_cursorLocations, 1, 16) + pointEntry(std::nextafter(end, 1e9), x, y);
+}
+
 TEST_F(RedactCommand, ClearsKeysInAMovie) {
     const std::string file = write("movie.mp4", media() + zulmAtom({keyStream(), locationStream()}));
     const std::string copy = redacted(file, {"--keys"});
@@ -67,7 +74,7 @@ TEST_F(RedactCommand, HidesTitlesInEveryContainer) {
 TEST_F(RedactCommand, LeavesNothingOfTheHiddenTextsInARecording) {
     const Json texts = Json::parse(runTool({"grep", ".", movie(), "--json"}).output)["files"][0]["matches"];
     ASSERT_FALSE(texts.empty());
-    const std::string copy = redacted(movie(), {"--titles", ".", "--keys", "--streams", "systemData"});
+    const std::string copy = redacted(movie(), {"--titles", ".", "--keys", "--stream", "systemData"});
     for (const Json& match : texts)
         EXPECT_THAT(copy, Not(HasSubstr(match["text"].get<std::string>())));
     EXPECT_THAT(copy, Not(HasSubstr("ProcessorCount")));
@@ -78,30 +85,76 @@ TEST_F(RedactCommand, LeavesNothingOfTheHiddenTextsInARecording) {
 }
 
 TEST_F(RedactCommand, ChangesNothingElse) {
-    redacted(movie(), {"--streams", "systemData"});
+    redacted(movie(), {"--stream", "systemData"});
     const ToolResult result = runTool({"diff", movie(), folder / "out.mp4"});
     EXPECT_EQ(result.output, "systemData: only in " + movie() + "\n");
 }
 
 TEST_F(RedactCommand, RemovesStreamsAndTimes) {
     const std::string file = write("movie.mp4", media() + zulmAtom({locationStream(), appNameStream()}));
-    EXPECT_EQ(redacted(file, {"--streams", "topmostAppName"}), media() + zulmAtom({locationStream()}));
+    EXPECT_EQ(redacted(file, {"--stream", "topmostAppName"}), media() + zulmAtom({locationStream()}));
     const std::string late = streamHeader(s_cursorLocations, 1, 16) + pointEntry(1.0, -3, 7);
     const std::string lateNames = streamHeader(s_appNames, 1, 0) + textEntry(2.0, "Notes");
-    EXPECT_EQ(redacted(file, {"--range", ":0.75"}), media() + zulmAtom({lateNames, late}));
-    EXPECT_EQ(redacted(file, {"--range", "0.5:0.5"}), media() + zulmAtom({lateNames, late}));
+    EXPECT_EQ(redacted(file, {"--range", ":1"}), media() + zulmAtom({lateNames, carriedTo(1, -3, 7)}));
+    const std::string carried = carriedTo(0.75, 10, 20) + pointEntry(1.0, -3, 7);
+    EXPECT_EQ(redacted(file, {"--range", ":0.75"}), media() + zulmAtom({lateNames, carried}));
+    EXPECT_EQ(redacted(file, {"--range", "0.5:0.75"}), media() + zulmAtom({lateNames, carried}));
     const std::string early = streamHeader(s_cursorLocations, 1, 16) + pointEntry(0.5, 10, 20);
-    const std::string earlyNames = streamHeader(s_appNames, 1, 0) + textEntry(0.5, "Abc");
+    const std::string earlyNames = streamHeader(s_appNames, 1, 0) + textEntry(0.5, s_ellipsis);
     EXPECT_EQ(redacted(file, {"--range", "0.75:"}), media() + zulmAtom({earlyNames, early}));
+}
+
+TEST_F(RedactCommand, TakesRangesTitlesAndKindsMoreThanOnce) {
+    const std::string names = streamHeader(s_appNames, 1, 0);
+    const std::string scrolls = streamHeader("2b7b6a05", 1, 16);
+    const std::string file = write(
+        "movie.mp4", media() + zulmAtom({scrolls + pointEntry(1, 0, 1) + pointEntry(2, 0, 2) + pointEntry(62, 0, 3),
+                                         locationStream(), appNameStream()}));
+    EXPECT_EQ(redacted(file, {"--range", "0.75:1.5", "--range", "61..63", "--keep-only", "scrollAction"}),
+              media() + zulmAtom({scrolls + pointEntry(2, 0, 2)}));
+    EXPECT_EQ(
+        redacted(file, {"--titles", "^A", "--titles", "^N", "--stream", "scrollAction", "--stream", "cursorLocation"}),
+        media() + zulmAtom({names + textEntry(0.5, s_ellipsis) + textEntry(2, s_ellipsis)}));
+    EXPECT_EQ(redacted(file, {"--keep-only", "scrollAction", "--keep-only", "topmostAppName"}),
+              media() + zulmAtom({scrolls + pointEntry(1, 0, 1) + pointEntry(2, 0, 2) + pointEntry(62, 0, 3),
+                                  appNameStream()}));
+}
+
+TEST_F(RedactCommand, TakesFileAfterAnyOption) {
+    const std::string file = write("movie.mp4", media() + zulmAtom({locationStream(), appNameStream()}));
+    for (const std::vector<std::string>& options : {std::vector<std::string>{"--stream", "topmostAppName"},
+                                                    {"--keep-only", "cursorLocation"},
+                                                    {"--titles", "Not"},
+                                                    {"--range", "5:"}}) {
+        std::vector<std::string> arguments{"redact", "-o", folder / "out.mp4", "--force"};
+        arguments.insert(arguments.end(), options.begin(), options.end());
+        arguments.push_back(file);
+        EXPECT_EQ(runTool(arguments).exitCode, 0) << options.front();
+    }
+}
+
+TEST_F(RedactCommand, HidesATextOfTheRangeInEveryStream) {
+    const std::string titles = streamHeader("2b7b6a07", 1, 0);
+    const std::string file =
+        write("movie.mp4", media() + zulmAtom({appNameStream(), titles + textEntry(0, "Notes") + textEntry(1, "Abc")}));
+    EXPECT_EQ(redacted(file, {"--range", "3:4"}),
+              media() + zulmAtom({hiddenNames().substr(0, 24) + textEntry(0.5, s_ellipsis) + textEntry(2, s_ellipsis),
+                                  titles + textEntry(0, s_ellipsis) + textEntry(1, s_ellipsis)}));
+}
+
+TEST_F(RedactCommand, FindsTitlesInEveryNormalForm) {
+    const std::string names = streamHeader(s_appNames, 1, 0);
+    const std::string apart = write("movie.mp4", media() + zulmAtom({names + textEntry(1, "Cafe\xcc\x81")}));
+    EXPECT_EQ(redacted(apart, {"--titles", "Caf\xc3\xa9"}), media() + zulmAtom({names + textEntry(1, s_ellipsis)}));
 }
 
 TEST_F(RedactCommand, LeavesNoMetadataWhereAllOfItGoes) {
     const std::string file = write("movie.mp4", media() + zulmAtom({appNameStream()}));
-    const ToolResult result = runTool({"redact", file, "-o", folder / "out.mp4", "--streams", "topmostAppName"});
+    const ToolResult result = runTool({"redact", file, "-o", folder / "out.mp4", "--stream", "topmostAppName"});
     EXPECT_EQ(result.exitCode, 0) << result.errors;
     EXPECT_EQ(contentsOf(folder / "out.mp4"), media());
     const std::string stream = write("a.dat", appNameStream());
-    EXPECT_EQ(runTool({"redact", stream, "-o", folder / "b.dat", "--streams", "topmostAppName"}).exitCode, 1);
+    EXPECT_EQ(runTool({"redact", stream, "-o", folder / "b.dat", "--stream", "topmostAppName"}).exitCode, 1);
     EXPECT_FALSE(std::filesystem::exists(folder / "b.dat"));
 }
 
@@ -196,7 +249,7 @@ TEST_F(RedactCommand, RefusesWhatItCannotMean) {
     for (const char* range : {"5", ":", "a:b", "5:4", "nan:1", "1:2:3", "1x:2"})
         EXPECT_EQ(runTool({"redact", movie(), "-o", output, "--range", range}).exitCode, 2) << range;
     EXPECT_EQ(runTool({"redact", movie(), "-o", output, "--titles", "("}).exitCode, 2);
-    EXPECT_EQ(runTool({"redact", movie(), "-o", output, "--streams", "nonsense"}).exitCode, 2);
+    EXPECT_EQ(runTool({"redact", movie(), "-o", output, "--stream", "nonsense"}).exitCode, 2);
     EXPECT_EQ(runTool({"redact", movie(), "-o", folder / "out.wav", "--keys"}).exitCode, 1);
     EXPECT_EQ(runTool({"redact", movie(), "-o", movie(), "--force", "--keys"}).exitCode, 1);
     EXPECT_EQ(runTool({"redact", write("none.mp4", media()), "-o", output, "--keys"}).exitCode, 4);
@@ -207,7 +260,7 @@ TEST_F(RedactCommand, RefusesWhatItCannotMean) {
 TEST_F(RedactCommand, ReportsAsJSON) {
     const std::string file = write("movie.mp4", media() + zulmAtom({keyStream(), appNameStream()}));
     const ToolResult result =
-        runTool({"redact", file, "-o", folder / "out.mp4", "--keys", "--streams", "topmostAppName", "--json"});
+        runTool({"redact", file, "-o", folder / "out.mp4", "--keys", "--stream", "topmostAppName", "--json"});
     const Json streams = Json::parse(result.output)["files"][0]["streams"];
     EXPECT_EQ(streams[0]["kind"], "topmostAppName");
     EXPECT_EQ(streams[0]["removed"], true);

@@ -142,7 +142,7 @@ TEST_F(Schema, HoldsForExtractAndSalvage) {
 
 TEST_F(Schema, HoldsForRedact) {
     expectValid({outputOf({"redact", movie(), "-o", folder / "public.mp4", "--keys", "--titles", "README", "--range",
-                           "1:2", "--streams", "systemData"}),
+                           "1:2", "--stream", "systemData"}),
                  outputOf({"redact", torn(), "-o", folder / "public.dat", "--range", "1:"})});
 }
 

@@ -10,6 +10,7 @@
 
 #include <fmt/core.h>
 
+#include <algorithm>
 #include <cmath>
 #include <limits>
 #include <memory>
@@ -26,9 +27,10 @@ struct RedactOptions {
     std::string file;
     std::string output;
     std::vector<std::string> removedKinds;
+    std::vector<std::string> keptKinds;
     bool keys = false;
-    std::string titles;
-    std::optional<TimeRange> range;
+    std::vector<std::string> titles;
+    std::vector<TimeRange> ranges;
     bool force = false;
     bool json = false;
 };
@@ -42,27 +44,41 @@ double secondsIn(const std::string& text, double open) {
     return *seconds;
 }
 
-/// "10:20", ":20" or "10:".
+/// "10:20", ":20", "10:", and the same with "..", which lets both ends be time codes.
 TimeRange rangeIn(const std::string& text) {
     constexpr double endless = std::numeric_limits<double>::infinity();
-    const std::size_t colon = text.find(':');
-    if (colon == std::string::npos || text.size() == 1)
-        throw CLI::ValidationError(fmt::format("--range: {} is not of the form A:B, A: or :B", text));
-    const TimeRange range{secondsIn(text.substr(0, colon), -endless), secondsIn(text.substr(colon + 1), endless)};
+    const std::size_t dots = text.find("..");
+    const std::size_t middle = dots == std::string::npos ? text.find(':') : dots;
+    const std::size_t width = dots == std::string::npos ? 1 : 2;
+    if (middle == std::string::npos || text.size() == width)
+        throw CLI::ValidationError(fmt::format("--range: {} is not of the form A:B, A: or :B, or A..B", text));
+    const TimeRange range{secondsIn(text.substr(0, middle), -endless), secondsIn(text.substr(middle + width), endless)};
     if (range.from > range.to)
         throw CLI::ValidationError(fmt::format("--range: {} ends before it begins", text));
     return range;
+}
+
+std::vector<TextPattern> patternsIn(const RedactOptions& options) {
+    std::vector<TextPattern> patterns;
+    for (const std::string& title : options.titles)
+        patterns.emplace_back(title, false, false);
+    return patterns;
 }
 
 Redaction redactionFor(const RedactOptions& options) {
     Redaction redaction;
     for (const std::string& kind : options.removedKinds)
         redaction.removedKinds.insert(typeNamed(kind));
+    for (const std::string& kind : options.keptKinds)
+        redaction.keptKinds.insert(typeNamed(kind));
     redaction.clearsKeys = options.keys;
-    redaction.removedTimes = options.range;
+    redaction.removedTimes = options.ranges;
     if (!options.titles.empty())
-        redaction.hidesText = [pattern = std::make_shared<TextPattern>(options.titles, false, false)](
-                                  const std::string& text) { return pattern->matches(validText(text)); };
+        redaction.hidesText =
+            [patterns = std::make_shared<std::vector<TextPattern>>(patternsIn(options))](const std::string& text) {
+                return std::any_of(patterns->begin(), patterns->end(),
+                                   [valid = validText(text)](const auto& pattern) { return pattern.matches(valid); });
+            };
     return redaction;
 }
 
@@ -122,6 +138,7 @@ Json streamDocument(const RedactedStream& stream) {
             {"entries", stream.entries},
             {"entries_changed", stream.entriesChanged},
             {"entries_removed", stream.entriesRemoved},
+            {"entries_added", stream.entriesAdded},
             {"bytes_left_out", stream.bytesLeftOut}};
 }
 
@@ -182,30 +199,36 @@ void addRedactCommand(CLI::App& app, Action& chosen) {
     command->add_option("-o,--output", options->output, "The copy, of the same container")
         ->type_name("OUT")
         ->required();
-    addStreamOption(*command, options->removedKinds, "Remove this kind, such as cpuUsage, or UUID (repeatable)",
-                    "--streams")
-        ->allow_extra_args();
+    addStreamOption(*command, options->removedKinds, "Remove this kind, such as cpuUsage, or UUID (repeatable)");
+    addStreamOption(*command, options->keptKinds, "Remove all kinds except this one (repeatable)", "--keep-only");
     command->add_flag("--keys", options->keys,
                       "Make every keystroke character code 0 without modifiers; their times stay");
     command
         ->add_option("--titles", options->titles,
                      "Make every title, slide text, comment and application name in which this (RE2) is found an "
                      "ellipsis")
-        ->type_name("REGEX");
+        ->type_name("REGEX")
+        ->allow_extra_args(false);
     command
-        ->add_option_function<std::string>(
-            "--range", [options](const std::string& text) { options->range = rangeIn(text); },
-            "Remove the entries of all streams from A to B seconds; A or B may be missing")
-        ->type_name("A:B");
+        ->add_option_function<std::vector<std::string>>(
+            "--range",
+            [options](const std::vector<std::string>& texts) {
+                for (const std::string& text : texts)
+                    options->ranges.push_back(rangeIn(text));
+            },
+            "Remove the entries of all streams from A to B seconds; A or B may be missing. A text that holds inside is "
+            "hidden wherever it is recorded (repeatable)")
+        ->type_name("A:B")
+        ->allow_extra_args(false);
     command->add_flag("--force", options->force, "Replace OUT where it exists");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm redact Recording.mp4 -o Public.mp4 --keys --titles '(?i)salary|secret'\n"
-                    "zulm redact Recording.mp4 -o Public.mp4 --streams systemData keyboardAction --range 12.5:40");
+                    "zulm redact Recording.mp4 -o Public.mp4 --stream systemData --range 12.5:40 --range 60:");
     command->callback([options, &chosen] {
-        if (options->removedKinds.empty() && !options->keys && options->titles.empty() && !options->range)
-            throw CLI::RequiredError("at least one of --streams, --keys, --titles and --range");
-        if (!options->titles.empty())
-            const TextPattern checked(options->titles, false, false);
+        if (options->removedKinds.empty() && options->keptKinds.empty() && !options->keys && options->titles.empty() &&
+            options->ranges.empty())
+            throw CLI::RequiredError("at least one of --stream, --keep-only, --keys, --titles and --range");
+        patternsIn(*options);
         chosen = [options] { return runRedact(*options); };
     });
 }

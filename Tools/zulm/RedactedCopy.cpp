@@ -152,13 +152,31 @@ void RedactedCopy::write(const std::string& path, const std::string& name) {
         writeRIFF(path, streams.path());
 }
 
+/// A text that one stream makes a secret is hidden in every stream.
+Redaction RedactedCopy::redactionOfAllStreams() {
+    RedactedTexts texts;
+    for (const HeldStream& held : heldStreams(recording_))
+        orUnreadable(recording_.name(), [&] {
+            collectRedactedTexts(StreamSource::part(recording_.path(), held.offset, held.present).open(), redaction_,
+                                 texts);
+        });
+    Redaction redaction = redaction_;
+    redaction.hidesText = [texts = std::move(texts.hidden), &given = redaction_.hidesText](const std::string& text) {
+        return texts.contains(text) || (given && given(text));
+    };
+    if (redaction_.removedTimes.empty() && !redaction_.hidesText)
+        redaction.hidesText = nullptr; // then streams that cannot be looked into may stay
+    return redaction;
+}
+
 void RedactedCopy::writeStreams(const std::string& file) {
+    const Redaction redaction = redactionOfAllStreams();
     std::ofstream output = openOutput(file, name_);
     for (const HeldStream& held : heldStreams(recording_)) {
         const std::uint64_t begin = sizeOf(output, name_);
         const StreamSource source = StreamSource::part(recording_.path(), held.offset, held.present);
         RedactedStream stream =
-            orUnreadable(recording_.name(), [&] { return redactStream(source.open(), redaction_, output); });
+            orUnreadable(recording_.name(), [&] { return redactStream(source.open(), redaction, output); });
         stream.bytesLeftOut += held.declared - held.present;
         stream.header.uuid = held.type;
         streams_.push_back(stream);

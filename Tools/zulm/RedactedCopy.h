@@ -39,6 +39,7 @@ private:
     bool isKept(std::uint64_t offset) const;
     bool isBeforeMedia(std::size_t item) const;
 
+    ZULMetaData::Redaction redactionOfAllStreams();
     void writeStreams(const std::string& file);
     void writeMovie(const std::string& output, const std::string& streamFile) const;
     void writeRIFF(const std::string& output, const std::string& streamFile) const;

@@ -2,109 +2,343 @@
 
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
+#include "ZULMetaDataBridge/Source/RemovedTimes.h"
 
-#include <string_view>
+#include <cmath>
+#include <limits>
+#include <map>
+#include <utility>
 
 namespace ZULMetaData {
 
 namespace {
+
+/// What an entry says about the times around it.
+enum class TimeRole {
+    Event,  ///< it happened at its time
+    State,  ///< its value holds until the next entry
+    Text,   ///< likewise, and the value may be a secret
+    Always, ///< it describes the whole recording
+};
+
+template <class Kind>
+constexpr TimeRole roleOf() {
+    if (OneOf<Kind, RecordingRegionKind, ScaleFactorKind, SystemDataKind>)
+        return TimeRole::Always;
+    if (OneOf<Kind, KeyboardActionKind, ScrollActionKind>)
+        return TimeRole::Event;
+    return std::same_as<typename Kind::Value, std::string> ? TimeRole::Text : TimeRole::State;
+}
+
+bool isSecret(const std::string& text) {
+    return !text.empty() && text != s_hiddenText;
+}
+
+/// Finds the texts that were in force inside a removed range.
+class HeldTexts {
+public:
+    HeldTexts(const RemovedTimes& times, std::set<std::string>& texts) : times_(times), texts_(texts) {}
+
+    void add(const TimedValue<std::string>& entry) {
+        endAt(entry.time);
+        last_ = entry;
+    }
+
+    void endAt(double time) {
+        if (last_ && isSecret(last_->value) && wasRemoved(time))
+            texts_.insert(last_->value);
+    }
+
+private:
+    /// An entry that goes back in time, or nowhere, does not tell when the text before it ended.
+    bool wasRemoved(double end) const {
+        constexpr double never = std::numeric_limits<double>::infinity();
+        return times_.isRemoved(last_->time) || times_.meets(last_->time, end >= last_->time ? end : never);
+    }
+
+    const RemovedTimes& times_;
+    std::set<std::string>& texts_;
+    std::optional<TimedValue<std::string>> last_;
+};
+
+/// The pictures of cursors whose entries were removed, until a later entry takes them.
+class RemovedPictures {
+public:
+    explicit RemovedPictures(ReadBytes read) : read_(std::move(read)) {}
+
+    void remember(const CursorImage& cursor, const StreamEntry& entry) {
+        if (cursor.imageDataSize > 0)
+            entries_[cursor.uniqueId] = entry;
+    }
+
+    bool has(std::uint64_t cursor) const { return entries_.contains(cursor); }
+
+    /// Completes a cursor that is written: with its own picture, if it has one, or with the one that was removed.
+    CursorImage complete(const CursorImage& cursor, int version) {
+        const auto found = entries_.find(cursor.uniqueId);
+        if (found == entries_.end())
+            return cursor;
+        const StreamEntry entry = found->second;
+        entries_.erase(found);
+        if (cursor.imageDataSize > 0)
+            return cursor;
+        std::string bytes(entry.size, '\0');
+        bytes.resize(read_(entry.offset, {bytes.data(), bytes.size()}));
+        auto pictured = decodeEntry<CursorImage>(bytes, version);
+        if (!pictured)
+            return cursor;
+        pictured->value.flags = cursor.flags;
+        return std::move(pictured->value);
+    }
+
+private:
+    ReadBytes read_;
+    std::map<std::uint64_t, StreamEntry> entries_;
+};
 
 /// Decides over the entries of one kind.
 template <class Kind>
 class EntryRedactor {
 public:
     using Value = typename Kind::Value;
+    static constexpr TimeRole s_role = roleOf<Kind>();
 
-    EntryRedactor(const Redaction& redaction, RedactedStream& result, std::ostream& out)
-        : redaction_(redaction), result_(result), out_(out) {}
+    EntryRedactor(const Redaction& redaction, const std::set<std::string>& heldTexts, ReadBytes read,
+                  RedactedStream& result, std::ostream& out)
+        : redaction_(redaction), times_(redaction.removedTimes), heldTexts_(heldTexts), pictures_(std::move(read)),
+          result_(result), out_(out) {}
 
-    /// False where the entry does not fit its kind.
-    bool copy(std::string_view bytes) {
+    /// Returns false if the entry does not fit its kind.
+    bool copy(const StreamEntry& entry, std::string_view bytes) {
         const auto decoded = decodeEntry<Value>(bytes, result_.header.version);
         if (!decoded)
             return false;
-        if (isRemoved(decoded->time)) {
-            ++result_.entriesRemoved;
-            return true;
+        if (s_role != TimeRole::Always && times_.isRemoved(decoded->time)) {
+            remove(*decoded, entry, bytes);
+        } else {
+            carryTo(decoded->time);
+            keep(*decoded, bytes);
         }
-        ++result_.entries;
-        if (!writeChanged(*decoded))
-            out_.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
         return true;
     }
+
+    /// Call after the last entry.
+    void finish() { carryTo(std::numeric_limits<double>::infinity()); }
 
 private:
-    bool isRemoved(double time) const {
-        const auto& range = redaction_.removedTimes;
-        return range && !(time < range->from) && !(time > range->to);
+    void remove(const TimedValue<Value>& decoded, const StreamEntry& entry, std::string_view bytes) {
+        const TimeRange* range = times_.rangeAt(decoded.time);
+        if constexpr (s_role == TimeRole::Text) {
+            if (showsText_ && range)
+                add(range->from, s_hiddenText);
+            showsText_ = showsText_ && !range;
+        }
+        if constexpr (std::same_as<Value, CursorImage>)
+            pictures_.remember(decoded.value, entry);
+        if (s_role == TimeRole::State && range && std::isfinite(range->to))
+            carried_ = {std::nextafter(range->to, std::numeric_limits<double>::infinity()), decoded.value};
+        ++result_.entriesRemoved;
+        report(RedactedEntry::Removed, decoded.time, bytes);
     }
 
-    bool writeChanged(const TimedValue<Value>& decoded) {
-        Value value = decoded.value;
-        if constexpr (std::same_as<Value, KeyStroke>) {
-            if (redaction_.clearsKeys)
-                value = KeyStroke();
-        } else if constexpr (std::same_as<Value, std::string>) {
-            if (redaction_.hidesText && redaction_.hidesText(value))
-                value = s_hiddenText;
+    /// Adds the value that the removed entries left behind, unless the entry at `time` takes its place.
+    void carryTo(double time) {
+        if (!carried_ || time < carried_->time)
+            return;
+        const TimedValue<Value> carried = *std::exchange(carried_, std::nullopt);
+        if (time > carried.time && !isShown(carried.value))
+            add(carried.time, carried.value);
+    }
+
+    void keep(const TimedValue<Value>& decoded, std::string_view bytes) {
+        const Value value = redacted(decoded.value);
+        ++result_.entries;
+        shownNow(value);
+        if (value == decoded.value) {
+            out_.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+            return;
         }
-        if (value == decoded.value)
-            return false;
         ++result_.entriesChanged;
         metaDataWrite<Value>(decoded.time, value, out_, result_.header.version);
-        return true;
+        report(RedactedEntry::Changed, decoded.time, bytes);
+    }
+
+    void add(double time, const Value& value) {
+        const Value whole = redacted(value);
+        ++result_.entries;
+        ++result_.entriesAdded;
+        shownNow(whole);
+        metaDataWrite<Value>(time, whole, out_, result_.header.version);
+        report(RedactedEntry::Added, time, {});
+    }
+
+    Value redacted(const Value& value) {
+        if constexpr (std::same_as<Kind, KeyboardActionKind>)
+            return redaction_.clearsKeys ? KeyStroke() : value;
+        else if constexpr (s_role == TimeRole::Text)
+            return heldTexts_.contains(value) || (redaction_.hidesText && redaction_.hidesText(value)) ? s_hiddenText
+                                                                                                       : value;
+        else if constexpr (std::same_as<Value, CursorImage>)
+            return pictures_.complete(value, result_.header.version);
+        else
+            return value;
+    }
+
+    /// Whether the copy shows the value already, by its last entry.
+    bool isShown(const Value& value) const {
+        if constexpr (std::same_as<Value, CursorImage>)
+            return shown_ && shown_->uniqueId == value.uniqueId && !pictures_.has(value.uniqueId);
+        else
+            return shown_ && *shown_ == value;
+    }
+
+    void shownNow(const Value& value) {
+        if constexpr (s_role == TimeRole::Text)
+            showsText_ = value != s_hiddenText;
+        else if constexpr (std::same_as<Value, CursorImage>)
+            shown_.emplace().uniqueId = value.uniqueId; // without the picture, which may be large
+        else if constexpr (s_role == TimeRole::State)
+            shown_ = value;
+    }
+
+    void report(RedactedEntry::Action action, double time, std::string_view original) const {
+        if (redaction_.onEntry)
+            redaction_.onEntry({action, result_.header, time, original});
     }
 
     const Redaction& redaction_;
+    RemovedTimes times_;
+    const std::set<std::string>& heldTexts_;
+    RemovedPictures pictures_;
     RedactedStream& result_;
     std::ostream& out_;
+    std::optional<TimedValue<Value>> carried_;
+    std::optional<Value> shown_;
+    bool showsText_ = false;
 };
 
 /// Whether an entry of any kind might have to go or to change.
 bool mustLookInto(const Redaction& redaction, const uuid& type) {
-    return redaction.hidesText || redaction.removedTimes || (redaction.clearsKeys && type == s_keyboardActionUUID);
+    return redaction.hidesText || !redaction.removedTimes.empty() ||
+           (redaction.clearsKeys && type == s_keyboardActionUUID);
+}
+
+bool isAskedFor(const Redaction& redaction, const uuid& type) {
+    return redaction.removedKinds.contains(type) ||
+           (!redaction.keptKinds.empty() && !redaction.keptKinds.contains(type));
 }
 
 RedactedStream::Removal removalOf(const std::optional<MetaDataHeader>& header, const Redaction& redaction) {
     if (!header)
         return RedactedStream::Headless;
-    if (redaction.removedKinds.contains(header->uuid))
+    if (isAskedFor(redaction, header->uuid))
         return RedactedStream::Asked;
     const bool isLegible = isDecodable(*header) || !mustLookInto(redaction, header->uuid);
     return isLegible ? RedactedStream::Kept : RedactedStream::Undecodable;
 }
 
 void writeHeader(MetaDataHeader header, std::ostream& out) {
-    header.fixedEntrySize = entrySizeOf(header); // what readers go by, whatever it said
+    header.fixedEntrySize = entrySizeOf(header); // the size that readers of its kind go by, whatever the header said
     out.write(reinterpret_cast<const char*>(&header), sizeof header);
 }
 
-/// `copy` gets the bytes of each entry; false ends the walk in front of it. Gives where it ended.
-template <class Copy>
-std::uint64_t walk(StreamEntries& entries, Copy copy) {
+/// Calls `visit` with each entry and its bytes until it returns false. Returns where the walk ended.
+template <class Visit>
+std::uint64_t walk(StreamEntries& entries, Visit visit) {
     while (const auto entry = entries.next())
-        if (!copy(entries.bytesOf(*entry)))
+        if (!visit(*entry, entries.bytesOf(*entry)))
             return entry->offset;
     return entries.wholeBytes();
 }
 
+/// Calls `visit` with each decoded entry of a stream of texts or of lists of texts.
+template <class Visit>
+void visitTexts(StreamEntries& entries, Visit visit) {
+    if (!entries.header() || !isDecodable(*entries.header()))
+        return;
+    RecordedKinds::visit(entries.header()->uuid, [&]<class Kind>() {
+        using Value = typename Kind::Value;
+        if constexpr (OneOf<Value, std::string, std::list<std::string>>)
+            walk(entries, [&](const StreamEntry&, std::string_view bytes) {
+                const auto decoded = decodeEntry<Value>(bytes, entries.header()->version);
+                if (decoded)
+                    visit(*decoded);
+                return decoded.has_value();
+            });
+    });
+}
+
+std::set<std::string> textsHeldInside(const StreamSource::Bytes& stream, const Redaction& redaction) {
+    std::set<std::string> texts;
+    if (redaction.removedTimes.empty())
+        return texts;
+    const RemovedTimes times(redaction.removedTimes);
+    HeldTexts held(times, texts);
+    StreamEntries entries = entriesOf(stream.read, stream.length);
+    visitTexts(entries, [&]<class Value>(const TimedValue<Value>& decoded) {
+        if constexpr (std::same_as<Value, std::string>)
+            held.add(decoded);
+    });
+    held.endAt(std::numeric_limits<double>::infinity());
+    return texts;
+}
+
+void reportRemovedStream(StreamEntries& entries, const Redaction& redaction) {
+    if (!redaction.onEntry || !entries.header() || !isDecodable(*entries.header()))
+        return;
+    walk(entries, [&](const StreamEntry&, std::string_view bytes) {
+        const auto time = timeOfEntry(*entries.header(), bytes);
+        if (time)
+            redaction.onEntry({RedactedEntry::Removed, *entries.header(), *time, bytes});
+        return time.has_value();
+    });
+}
+
 } // namespace
+
+void collectRedactedTexts(const StreamSource::Bytes& stream, const Redaction& redaction, RedactedTexts& texts) {
+    StreamEntries entries = entriesOf(stream.read, stream.length);
+    const RedactedStream::Removal removal = removalOf(entries.header(), redaction);
+    const auto collect = [&](const std::string& text) {
+        if (!isSecret(text))
+            return;
+        if (removal != RedactedStream::Kept)
+            texts.removed.insert(text);
+        else if (redaction.hidesText && redaction.hidesText(text))
+            texts.hidden.insert(text);
+    };
+    visitTexts(entries, [&]<class Value>(const TimedValue<Value>& decoded) {
+        if constexpr (std::same_as<Value, std::string>)
+            collect(decoded.value);
+        else if (removal != RedactedStream::Kept)
+            for (const std::string& text : decoded.value)
+                collect(text);
+    });
+    if (removal == RedactedStream::Kept)
+        texts.hidden.merge(textsHeldInside(stream, redaction));
+}
 
 RedactedStream redactStream(const StreamSource::Bytes& stream, const Redaction& redaction, std::ostream& out) {
     RedactedStream result;
     StreamEntries entries = entriesOf(stream.read, stream.length);
     result.header = entries.header().value_or(MetaDataHeader());
     result.removal = removalOf(entries.header(), redaction);
-    if (result.removal != RedactedStream::Kept)
+    if (result.removal != RedactedStream::Kept) {
+        reportRemovedStream(entries, redaction);
         return result;
+    }
     writeHeader(result.header, out);
+    const std::set<std::string> heldTexts = textsHeldInside(stream, redaction);
     std::uint64_t end = s_metaDataHeaderSize;
     const bool isWalked = isDecodable(result.header) && RecordedKinds::visit(result.header.uuid, [&]<class Kind>() {
-                              EntryRedactor<Kind> redactor(redaction, result, out);
-                              end = walk(entries, [&](std::string_view bytes) { return redactor.copy(bytes); });
+                              EntryRedactor<Kind> redactor(redaction, heldTexts, stream.read, result, out);
+                              end = walk(entries, [&](const StreamEntry& entry, std::string_view bytes) {
+                                  return redactor.copy(entry, bytes);
+                              });
+                              redactor.finish();
                           });
     if (!isWalked)
-        end = walk(entries, [&](std::string_view bytes) {
+        end = walk(entries, [&](const StreamEntry&, std::string_view bytes) {
             out.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
             ++result.entries;
             return true;

@@ -49,7 +49,7 @@ def cases(streams, place):
         (Case("stamp", stamp, {"disk/Movie.mp4": movie}, "disk/Movie.mp4"), {"disk/Movie.mp4": whole}),
         (Case("extract", ["extract", "Recording.mp4", "-o", "disk"], {"Recording.mp4": whole + metadata}),
          {f"disk/{name}": contents for name, contents in files.items()}),
-        (Case("redact", ["redact", "Recording.mp4", "--streams", "cpuUsage", "-o", "disk/Out.mp4"],
+        (Case("redact", ["redact", "Recording.mp4", "--stream", "cpuUsage", "-o", "disk/Out.mp4"],
               {"Recording.mp4": whole + metadata}), {"disk/Out.mp4": whole + metadata}),
     ]
 
