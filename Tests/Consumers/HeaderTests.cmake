@@ -25,3 +25,9 @@ if(CMAKE_SYSTEM_NAME STREQUAL "Linux")
   zulm_project_options(crowded_application)
   add_test(NAME Consumers/crowded_application COMMAND crowded_application)
 endif()
+
+find_program(PYTHON3 python3 REQUIRED)
+mark_as_advanced(PYTHON3)
+set(compile_with ${CMAKE_CXX_COMPILER} -std=c++20 -I${PROJECT_SOURCE_DIR})
+add_test(NAME Consumers/wrong_type COMMAND ${PYTHON3} ${CMAKE_CURRENT_LIST_DIR}/compile.py refused
+  ${CMAKE_CURRENT_LIST_DIR}/wrong_type.cpp "T must be one of these" ${compile_with})

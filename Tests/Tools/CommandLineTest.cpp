@@ -66,12 +66,34 @@ TEST_F(CommandLine, RefusesWrongArguments) {
     expectRefused({"dump", "a.mp4", "b.mp4"}, "b.mp4 is one argument too many");
     expectRefused({"dump", "--format", "jsn", "a.mp4"},
                   "--format: jsn is none of text, json, ndjson, csv; did you mean json?");
-    expectRefused({"dump", "--from", "soon", "a.mp4"}, "--from: soon is no number of seconds");
-    expectRefused({"dump", "--from", "inf", "a.mp4"}, "--from: inf is no number of seconds");
     expectRefused({"dump", "--from", "2", "--to", "1", "a.mp4"}, "--from: 2 is later than --to 1");
     expectRefused({"info", "--color", "sometimes", "a.mp4"}, "--color: sometimes is none of auto, always, never");
     expectRefused({"info", "-q", "-v", "a.mp4"}, "excludes");
     expectRefused({"--generate", "pdf"}, "nothing is generated as pdf");
+}
+
+TEST_F(CommandLine, RefusesWhatIsNoNumber) {
+    for (const std::string word : {"", " ", "nan", "inf", "-inf", "0x1", "1e400", "soon", "1s", "1:75", "1:2:3:4"}) {
+        for (const std::string option : {"--from", "--to"})
+            expectRefused({"dump", option + "=" + word, "a.mp4"}, option + ": '" + word + "' is not a time");
+        expectRefused({"convert", "--to", "srt", "--pause=" + word, "a.mp4"}, "--pause: '" + word + "' is not a time");
+        expectRefused({"diff", "--limit=" + word, "a.mp4", "b.mp4"},
+                      "--limit: '" + word + "' is not a whole number such as 0 or 100");
+    }
+    expectRefused({"convert", "--to", "srt", "--pause", "-1", "a.mp4"}, "--pause: '-1' is not a time");
+    expectRefused({"convert", "--to", "srt", "--pause", "0", "a.mp4"}, "--pause: 0 is not from 0.001 to 3600 seconds");
+    expectRefused({"dump", "--from", "", "a.mp4"}, "--from: '' is not a time");
+    expectRefused({"diff", "--limit", "-1", "a.mp4", "b.mp4"}, "--limit: '-1' is not a whole number");
+    expectRefused({"diff", "--limit", "1.5", "a.mp4", "b.mp4"}, "--limit: '1.5' is not a whole number");
+}
+
+TEST_F(CommandLine, TakesTimeCodesForSeconds) {
+    const std::string file = folder / "locations.dat";
+    writeFile(file, locations());
+    const std::string bySeconds = runTool({"dump", "--from", "0.5", "--to", "1e3", file}).output;
+    EXPECT_NE(bySeconds, "");
+    EXPECT_EQ(runTool({"dump", "--from", "0:00.5", "--to", "0:16:40", file}).output, bySeconds);
+    EXPECT_EQ(runTool({"dump", "--from", "-0:10", file}).output, runTool({"dump", file}).output);
 }
 
 TEST_F(CommandLine, TakesAFileThatIsNamedLikeACommand) {

@@ -1,9 +1,6 @@
 #include "Tools/zulm/Choice.h"
 
-#include "Tools/zulm/Number.h"
-
 #include <cctype>
-#include <cmath>
 #include <cstddef>
 #include <limits>
 #include <numeric>
@@ -49,15 +46,30 @@ std::string nearestTo(std::string_view word, const std::vector<std::string>& can
     return least <= 1 + word.size() / 4 ? nearest : std::string();
 }
 
+double requireSeconds(const std::string& name, const std::string& word, Sign sign) {
+    const std::optional<double> seconds = secondsFrom(word, sign);
+    if (!seconds)
+        throw CLI::ValidationError(
+            name, fmt::format("'{}' is not a time; give seconds (90, 12.5) or a time code (1:30, 0:01:02.5){}", word,
+                              sign == Sign::NeverNegative ? " that is not negative" : ""));
+    return *seconds;
+}
+
 CLI::Option* addSeconds(CLI::App& command, const std::string& name, std::optional<double>& value,
-                        const std::string& description) {
-    const auto take = [&value, name](const std::string& word) {
-        const std::optional<double> seconds = realNumber(word);
-        if (!seconds || !std::isfinite(*seconds))
-            throw CLI::ValidationError(name, fmt::format("{} is no number of seconds", word));
-        value = seconds;
-    };
+                        const std::string& description, Sign sign) {
+    const auto take = [&value, name, sign](const std::string& word) { value = requireSeconds(name, word, sign); };
     return command.add_option_function<std::string>(name, take, description)->type_name("SECONDS");
+}
+
+CLI::Option* addCount(CLI::App& command, const std::string& name, std::uint64_t& value,
+                      const std::string& description) {
+    const auto take = [&value, name](const std::string& word) {
+        const std::optional<std::uint64_t> number = wholeNumber(word);
+        if (!number)
+            throw CLI::ValidationError(name, fmt::format("'{}' is not a whole number such as 0 or 100", word));
+        value = *number;
+    };
+    return command.add_option_function<std::string>(name, take, description)->type_name("N");
 }
 
 std::string suggestionFor(std::string_view word, const std::vector<std::string>& candidates) {

@@ -2,11 +2,14 @@
 
 // Option values that are names out of a short list, and the help for names that are not.
 
+#include "Tools/zulm/Number.h"
+
 #include <CLI/CLI.hpp>
 #include <fmt/core.h>
 #include <fmt/ranges.h>
 
 #include <algorithm>
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -21,9 +24,16 @@ std::string nearestTo(std::string_view word, const std::vector<std::string>& can
 /// "; did you mean X?" or nothing.
 std::string suggestionFor(std::string_view word, const std::vector<std::string>& candidates);
 
-/// An option whose value is a finite number of seconds.
+/// The time that `word` stands for, as `secondsFrom` takes it. Throws the usage error of the option `name` if it stands
+/// for none.
+double requireSeconds(const std::string& name, const std::string& word, Sign sign = Sign::NeverNegative);
+
+/// An option whose value is a time in seconds or a time code.
 CLI::Option* addSeconds(CLI::App& command, const std::string& name, std::optional<double>& value,
-                        const std::string& description);
+                        const std::string& description, Sign sign = Sign::NeverNegative);
+
+/// An option whose value is a whole number.
+CLI::Option* addCount(CLI::App& command, const std::string& name, std::uint64_t& value, const std::string& description);
 
 /// An option whose value is the one of `values` that is named. Its type name lists the names, as "text|json".
 template <class Value>

@@ -16,6 +16,7 @@
 #include <new>
 #include <sstream>
 #include <system_error>
+#include <utility>
 
 namespace Zulm {
 
@@ -105,6 +106,24 @@ ExitCode generate(const CLI::App& app, const std::string& format) {
     return text.empty() ? refuse(app, fmt::format("nothing is generated as {}", format)) : print(text);
 }
 
+/// The words after the program's name. An option with an empty value ("--titles=") becomes two words, because the
+/// parser would take the next word as its value.
+std::vector<std::string> wordsOf(int argc, char** argv) {
+    std::vector<std::string> words;
+    bool areOptions = true;
+    for (int i = 1; i < argc; ++i) {
+        std::string word = argv[i];
+        areOptions = areOptions && word != "--";
+        const bool hasEmptyValue = areOptions && word.starts_with("--") && word.find('=') == word.size() - 1;
+        if (hasEmptyValue)
+            word.pop_back();
+        words.push_back(std::move(word));
+        if (hasEmptyValue)
+            words.emplace_back();
+    }
+    return words;
+}
+
 constexpr auto s_examples = "zulm info Recording.mp4                                   # what is in it\n"
                             "zulm verify Recording.mp4 || zulm salvage Recording.mp4 -o rescued\n"
                             "zulm dump --stream cursorLocation --format csv Recording.mp4 > cursor.csv";
@@ -134,7 +153,9 @@ ExitCode runCommandLine(int argc, char** argv, const std::vector<CommandGroup>& 
     define(app, chosen, groups);
     app.add_option("--generate", format)->group("");
     try {
-        app.parse(argc, argv);
+        std::vector<std::string> words = wordsOf(argc, argv);
+        std::reverse(words.begin(), words.end()); // the parser takes them from the end
+        app.parse(std::move(words));
     } catch (const CLI::Success& shown) { // help or version
         return print(app, shown);
     } catch (const CLI::ParseError& error) {

@@ -11,6 +11,7 @@
 #include <algorithm>
 #include <limits>
 #include <memory>
+#include <optional>
 
 namespace Zulm {
 
@@ -23,11 +24,14 @@ struct ConvertOptions {
     CaptionFormat format = CaptionFormat::SRT;
     std::string output;
     std::vector<std::string> kinds;
-    double pause = 1;
+    std::optional<double> pause;
     bool showsKeys = false;
     bool force = false;
 };
 
+constexpr double s_usualPause = 1; // all in seconds
+constexpr double s_shortestPause = 0.001;
+constexpr double s_longestPause = 3600;
 constexpr double s_untilTheNext = std::numeric_limits<double>::infinity();
 
 /// Collects what is said in the streams of one recording.
@@ -48,7 +52,7 @@ private:
         if constexpr (std::same_as<typename Kind::Value, KeyStroke>) {
             std::vector<KeyEvent> keys;
             walk<KeyStroke>(stream, [&](double time, const KeyStroke& key) { keys.push_back({time, key}); });
-            const auto found = keyCaptions(std::move(keys), options_.pause, options_.showsKeys);
+            const auto found = keyCaptions(std::move(keys), options_.pause.value_or(s_usualPause), options_.showsKeys);
             captions_.insert(captions_.end(), found.begin(), found.end());
         } else if constexpr (std::same_as<typename Kind::Value, std::string>) {
             std::string last = "\n"; // no title is like it
@@ -132,6 +136,12 @@ ExitCode runConvert(const ConvertOptions& options) {
     return reader.code();
 }
 
+void requirePauseInRange(double pause) {
+    if (pause < s_shortestPause || pause > s_longestPause)
+        throw CLI::ValidationError(
+            "--pause", fmt::format("{} is not from {} to {} seconds", pause, s_shortestPause, s_longestPause));
+}
+
 bool hasWords(const std::string& kind) {
     bool result = false;
     RecordedKinds::visit(typeNamed(kind), [&]<class Kind>() {
@@ -161,10 +171,8 @@ void addConvertCommand(CLI::App& app, Action& chosen) {
     addStreamOption(*command, options->kinds,
                     "What to write: keyboardAction, or a kind of texts (repeatable). Without it, keyboardAction as "
                     "captions, slideTitles and topmostWindowTitle as chapters");
-    command->add_option("--pause", options->pause, "Keys further apart than this make two captions")
-        ->type_name("SECONDS")
-        ->check(CLI::Range(0.001, 3600.0).description(""))
-        ->capture_default_str();
+    addSeconds(*command, "--pause", options->pause,
+               "Keys further apart than this make two captions (1 second unless it is given)");
     command->add_flag("--show-keys", options->showsKeys, "Show what was typed, passwords included");
     command->add_flag("--force", options->force, "Replace OUT where it exists");
     command->footer("zulm convert --to srt Recording.mp4 -o Recording.srt\n"
@@ -174,6 +182,7 @@ void addConvertCommand(CLI::App& app, Action& chosen) {
         for (const std::string& kind : options->kinds)
             if (!hasWords(kind))
                 throw CLI::ValidationError(fmt::format("--stream {}: it holds neither keystrokes nor texts", kind));
+        requirePauseInRange(options->pause.value_or(s_usualPause));
         chosen = [options] { return runConvert(*options); };
     });
 }

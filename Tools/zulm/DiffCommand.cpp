@@ -1,3 +1,4 @@
+#include "Tools/zulm/Choice.h"
 #include "Tools/zulm/EntryFormat.h"
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
@@ -306,9 +307,8 @@ void addDiffCommand(CLI::App& app, Action& chosen) {
     command->add_option("A", options->left, "A movie, RIFF file or stream file; - is standard input")->required();
     command->add_option("B", options->right, "What to compare it with, likewise")->required();
     addStreamOption(*command, options->kinds, "Only this kind, such as cursorLocation, or UUID (repeatable)");
-    command->add_option("--limit", options->limit, "List at most this many differences of each stream, 0 for all")
-        ->type_name("N")
-        ->capture_default_str();
+    addCount(*command, "--limit", options->limit,
+             "List at most this many differences of each stream (100 unless it is given, 0 for all)");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm diff Original.mp4 Edited.mp4\n"
                     "zulm diff --stream keyboardAction --limit 0 Original.mp4 Edited.mp4");

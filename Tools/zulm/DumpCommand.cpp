@@ -222,8 +222,8 @@ void addDumpCommand(CLI::App& app, Action& chosen) {
                {"json", EntryFormat::JSON},
                {"ndjson", EntryFormat::NDJSON},
                {"csv", EntryFormat::CSV}});
-    addSeconds(*command, "--from", options->from, "Only entries at this time or later");
-    addSeconds(*command, "--to", options->to, "Only entries at this time or earlier");
+    addSeconds(*command, "--from", options->from, "Only entries at this time or later", Sign::Any);
+    addSeconds(*command, "--to", options->to, "Only entries at this time or earlier", Sign::Any);
     command->add_option("--images", options->imageFolder, "Write cursor images into this folder, as they are stored")
         ->type_name("DIR");
     command->add_flag("--force", options->force, "Replace images that are there already");

@@ -4,9 +4,11 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <charconv>
 #include <cmath>
 #include <cstdlib>
 #include <string_view>
+#include <system_error>
 
 namespace Zulm {
 
@@ -25,6 +27,32 @@ bool isWrittenOut(float value, std::string digits) {
     return written <= telling + exponent;
 }
 
+/// A part of a time code after its first colon: two digits that are less than 60, or one of "0:5".
+bool isSixtieth(const std::string& part) {
+    const std::size_t digits = std::min(part.find('.'), part.size());
+    return digits >= 1 && digits <= 2 && realNumber(part).value_or(60) < 60;
+}
+
+/// "H:M:S" or "M:S" without a sign; only the seconds may have a fraction.
+std::optional<double> timeCode(const std::string& word) {
+    constexpr std::size_t mostColons = 2;
+    if (word.find_first_not_of("0123456789:.") != std::string::npos ||
+        std::count(word.begin(), word.end(), ':') > static_cast<std::ptrdiff_t>(mostColons))
+        return std::nullopt;
+    double seconds = 0;
+    for (std::size_t begin = 0; begin <= word.size();) {
+        const std::size_t end = std::min(word.find(':', begin), word.size());
+        const std::string part = word.substr(begin, end - begin);
+        const bool isLast = end == word.size();
+        const std::optional<double> number = realNumber(part);
+        if (!number || (begin > 0 && !isSixtieth(part)) || (!isLast && part.find('.') != std::string::npos))
+            return std::nullopt;
+        seconds = 60 * seconds + *number;
+        begin = end + 1;
+    }
+    return seconds;
+}
+
 } // namespace
 
 // Not every standard library has `std::from_chars` for real numbers. The tool never leaves the "C" locale.
@@ -39,6 +67,24 @@ std::optional<double> realNumber(const std::string& text) {
     const double number = std::strtod(text.c_str(), &end);
     const bool isTooLarge = errno == ERANGE && std::abs(number) > 1;
     return end == text.c_str() + text.size() && !isTooLarge ? std::optional(number) : std::nullopt;
+}
+
+std::optional<std::uint64_t> wholeNumber(const std::string& text) {
+    std::uint64_t number = 0;
+    const char* end = text.data() + text.size();
+    const auto [stop, error] = std::from_chars(text.data(), end, number);
+    return error == std::errc() && stop == end ? std::optional(number) : std::nullopt;
+}
+
+std::optional<double> secondsFrom(const std::string& word, Sign sign) {
+    const bool isNegative = word.starts_with('-');
+    if (isNegative && (sign == Sign::NeverNegative || word.starts_with("--")))
+        return std::nullopt;
+    const std::string amount = isNegative ? word.substr(1) : word;
+    const auto seconds = amount.find(':') == std::string::npos ? realNumber(amount) : timeCode(amount);
+    if (!seconds || !std::isfinite(*seconds))
+        return std::nullopt;
+    return isNegative ? -*seconds : *seconds;
 }
 
 // Not every standard library has `std::to_chars` for real numbers either.

@@ -9,13 +9,13 @@
 
 #include <array>
 #include <atomic>
-#include <concepts>
 #include <cstddef>
 #include <cstdint>
 #include <iterator>
 #include <memory>
 #include <string>
 #include <string_view>
+#include <type_traits>
 #include <utility>
 #include <variant>
 #include <vector>
@@ -26,6 +26,12 @@ class Image;
 
 /// What an entry holds under one key; each parser says of which types the values of its keys are.
 using EntryValue = std::variant<std::int32_t, std::int64_t, float, std::string, std::shared_ptr<const Image>>;
+
+/// Whether an `EntryValue` can hold a `T`.
+template <class T>
+inline constexpr bool isEntryValueType =
+    std::is_same_v<T, std::int32_t> || std::is_same_v<T, std::int64_t> || std::is_same_v<T, float> ||
+    std::is_same_v<T, std::string> || std::is_same_v<T, std::shared_ptr<const Image>>;
 
 /// What most kinds of entry consist of. A fifth of the size of an `EntryValue`.
 using EntryNumber = std::variant<std::int32_t, float>;
@@ -136,10 +142,15 @@ private:
 
 template <class T>
 T EntryDictionary::get(std::string_view key) const {
-    if constexpr (std::same_as<T, std::int32_t> || std::same_as<T, float>)
+    static_assert(isEntryValueType<T>, "get<T>: an entry holds std::int32_t, std::int64_t, float, std::string and "
+                                       "std::shared_ptr<const Image>; T must be one of these");
+    if constexpr (std::is_same_v<T, std::int32_t> || std::is_same_v<T, float>)
         if (!values_.load(std::memory_order_acquire))
             return std::get<T>(numbers_[indexOf(key)]);
-    return std::get<T>(at(key));
+    if constexpr (isEntryValueType<T>) // else the sentence above is followed by hundreds of lines from the variant
+        return std::get<T>(at(key));
+    else
+        throw std::bad_variant_access();
 }
 
 } // namespace ZULMetaData
