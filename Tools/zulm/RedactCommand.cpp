@@ -1,6 +1,6 @@
+#include "Tools/zulm/Choice.h"
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/Number.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/RedactedCopy.h"
 #include "Tools/zulm/Report.h"
@@ -11,7 +11,6 @@
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <cmath>
 #include <limits>
 #include <memory>
 #include <optional>
@@ -38,10 +37,7 @@ struct RedactOptions {
 double secondsIn(const std::string& text, double open) {
     if (text.empty())
         return open;
-    const std::optional<double> seconds = realNumber(text);
-    if (!seconds || std::isnan(*seconds))
-        throw CLI::ValidationError(fmt::format("--range: {} is no number of seconds", text));
-    return *seconds;
+    return requireSeconds("--range", text, Sign::Any);
 }
 
 /// "10:20", ":20", "10:", and the same with "..", which lets both ends be time codes.
