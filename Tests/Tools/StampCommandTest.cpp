@@ -42,6 +42,17 @@ TEST_F(StampCommand, AppendsTheRecordingInfo) {
               media() + be32(1) + "ZULR" + be64(80) + le64(1) + "Mac" + std::string(21, '\0') + "4.2" + '\0');
 }
 
+TEST_F(StampCommand, SaysThatThePlatformStandsInPlaceOfTheCreator) {
+    writeFile(movie, media());
+    EXPECT_THAT(stamp({"--in-place"}).output,
+                HasSubstr("Mac stands in place of Recorder: a movie stores the platform's name, not its creator's\n"));
+    const std::string help = runTool({"stamp", "--help"}).output;
+    EXPECT_THAT(help, HasSubstr("This name is not stored"));
+    EXPECT_THAT(runTool({"info", movie}).output, HasSubstr("creator: Mac 4.2 on version "));
+    EXPECT_THAT(runTool({"info", movie}).output,
+                HasSubstr("(the name is the platform's: no stamp stores the creator's)"));
+}
+
 TEST_F(StampCommand, RepairsAndStampsACopy) {
     const std::string open = atom("ftyp", "mp42") + be32(0) + "mdat" + "0123456789";
     writeFile(movie, open);

@@ -24,6 +24,26 @@ protected:
     static void recordFirst(Writer& writer) { S::samples().at(0).record(writer); }
 };
 
+/// Writes one entry at `time`. False for the kinds whose one entry always has the time 0.
+template <class Writer>
+bool recordAt(Writer& writer, const MediaTime& time) {
+    if constexpr (requires { writer.writeCharacterCode(65, 0, time); })
+        writer.writeCharacterCode(65, 0, time);
+    else if constexpr (requires { writer.writeCursorWithExistingUID(7, time); })
+        writer.writeCursorWithExistingUID(7, time);
+    else if constexpr (requires { writer.write("text", time); })
+        writer.write("text", time);
+    else if constexpr (requires { writer.write(ScreenPoint(1, 2), time); })
+        writer.write(ScreenPoint(1, 2), time);
+    else if constexpr (requires { writer.write(ScreenRect(1, 2, 3, 4), time); })
+        writer.write(ScreenRect(1, 2, 3, 4), time);
+    else if constexpr (requires { writer.write(1, time); })
+        writer.write(1, time);
+    else
+        return false;
+    return true;
+}
+
 template <class Kinds>
 struct TypesOf;
 template <class... Samples>
@@ -110,6 +130,23 @@ TYPED_TEST(WriterHealth, IsGoodAgainAfterItWasSetUpAnew) {
     EXPECT_EQ(writer.entriesWritten(), 1U);
     writer.setup();
     EXPECT_EQ(writer.entriesWritten(), 0U);
+}
+
+TYPED_TEST(WriterHealth, IsBadAfterATimeThatIsNotFinite) {
+    for (const MediaTime& time : {MediaTime(), MediaTime(1, 0), MediaTime(-1, 0)}) {
+        typename TypeParam::Writer writer(this->file);
+        if (!recordAt(writer, time))
+            GTEST_SKIP() << "its entry always has the time 0";
+        EXPECT_FALSE(writer.isHealthy());
+        EXPECT_TRUE(recordAt(writer, MediaTime(1, 4)));
+        EXPECT_FALSE(writer.isHealthy());
+        EXPECT_EQ(writer.entriesWritten(), 2U); // both are in the file
+        finish(writer);
+        const auto extent = measureStream(StreamSource::file(this->file).open().read, contentsOf(this->file).size());
+        EXPECT_EQ(extent->entries, 2U);
+        writer.setup();
+        EXPECT_TRUE(writer.isHealthy());
+    }
 }
 
 class WriterHealthOfABuffer : public StreamFixture {};

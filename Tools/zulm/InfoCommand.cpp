@@ -48,6 +48,13 @@ void printRow(const StreamInfo& stream) {
                             stream.range.length, stream.version, uuidText(stream.type)));
 }
 
+std::string creatorLine(const CreatorAttributes& creator) {
+    const bool isPlatform = creator.name() == CreatorAttributes::platformNameMac();
+    return fmt::format("  creator: {} {} on version {}{}\n", shown(creator.name()), shown(creator.version()),
+                       shown(creator.platformVersion()),
+                       isPlatform ? " (the name is the platform's: no stamp stores the creator's)" : "");
+}
+
 void print(const FileInfo& file) {
     const std::string duration = file.duration ? fmt::format("{:.3f} s", *file.duration) : "duration not told";
     writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", withoutControls(file.name), file.container, duration,
@@ -58,9 +65,8 @@ void print(const FileInfo& file) {
                     '\n');
     for (const StreamInfo& stream : file.streams)
         printRow(stream);
-    for (const ZCAPHeader& creator : file.creators)
-        writeOutput(fmt::format("  creator: {} {} on version {}\n", shown(creator.creator.name()),
-                                shown(creator.creator.version()), shown(creator.creator.platformVersion())));
+    for (const ZCAPHeader& info : file.creators)
+        writeOutput(creatorLine(info.creator));
     for (const LayoutItem& child : metaDataChildren(file.layout))
         if (child.isForeign)
             writeOutput(fmt::format("  foreign atom: '{}' at offset {}, {} bytes\n", printable(child.item.type),

@@ -19,11 +19,14 @@ struct StampOptions {
     bool json = false;
 };
 
-void print(const std::string& name, const StampResult& stamped) {
+void print(const StampOptions& options, const std::string& name, const StampResult& stamped) {
     const CreatorAttributes& creator = stamped.info.creator;
     printRepair(name, stamped.repair);
     writeOutput(fmt::format("{}: stamped as {} {} on version {}\n", withoutControls(name), creator.name(),
                             creator.version(), creator.platformVersion()));
+    if (creator.name() != options.creator)
+        writeOutput(fmt::format("  {} stands in place of {}: a movie stores the platform's name, not its creator's\n",
+                                creator.name(), withoutControls(options.creator)));
 }
 
 void report(const StampOptions& options, const std::string& name, const StampResult& stamped) {
@@ -52,7 +55,7 @@ ExitCode runStamp(const StampOptions& options) {
     if (options.json)
         report(options, movie.name(), stamped);
     else
-        print(movie.name(), stamped);
+        print(options, movie.name(), stamped);
     return worseOf(complainAboutLoss(movie.name(), stamped.repair), complainAboutCut(options, stamped.info.creator));
 }
 
@@ -60,14 +63,18 @@ ExitCode runStamp(const StampOptions& options) {
 
 void addStampCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<StampOptions>();
-    CLI::App* command = app.add_subcommand("stamp", "Append the recording info atom to a movie");
+    CLI::App* command =
+        app.add_subcommand("stamp", "Append the recording info atom to a movie: a platform, a version, a system");
     addSaveOptions(*command, options->save);
     command
         ->add_option("--creator", options->creator,
-                     "Who made it (readers tell platforms apart by this: the platform's name is stored in its place)")
+                     "Who made the movie. This name is not stored: readers tell platforms apart by its field, so that "
+                     "every stamp, on any system, stores the platform's name Mac in its place")
         ->required()
         ->type_name("NAME");
-    command->add_option("--creator-version", options->version, "The version of who made it, at most 15 bytes")
+    command
+        ->add_option("--creator-version", options->version,
+                     "The version of the creator, at most 15 bytes; it is stored")
         ->required()
         ->type_name("V");
     command->add_flag("--json", options->json, "Print one JSON document");

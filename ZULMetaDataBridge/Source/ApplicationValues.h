@@ -39,7 +39,7 @@ concept PlatformTime = requires(const R& r) {
 /// A time as the platform's media services count it.
 struct MediaTime {
     std::int64_t value = 0;     ///< in units of 1 / `timescale` seconds
-    std::int32_t timescale = 0; ///< units of `value` in a second
+    std::int32_t timescale = 0; ///< units of `value` in a second; 0 is no time, see `seconds`
     std::uint32_t flags = 0;    ///< never looked at
     std::int64_t epoch = 0;     ///< never looked at
 
@@ -54,7 +54,8 @@ struct MediaTime {
     template <PlatformTime T>
     constexpr MediaTime(const T& time) : MediaTime(time.value, time.timescale, time.flags, time.epoch) {}
 
-    /// Flags and epoch do not count. A timescale of 0 gives an infinite time or not a number.
+    /// Flags and epoch do not count. If the timescale is 0, as in a default `MediaTime`, the result is infinite or not a
+    /// number; a writer stores it as it is, and its `isHealthy` returns false from then on.
     double seconds() const { return static_cast<double>(value) / static_cast<double>(timescale); }
 };
 

@@ -10,6 +10,7 @@
 #include "BaseMetaDataWriter.h"
 #include "KeptReachable.h"
 
+#include <cmath>
 #include <cstdint>
 #include <memory>
 #include <new>
@@ -33,6 +34,7 @@ public:
     void setup() override {
         release();
         entriesWritten_ = 0;
+        hasOnlyFiniteTimes_ = true;
         std::unique_ptr<StreamWriter, Destroyer> writer(new StreamWriter);
         if (Release == StreamWriterRelease::Never)
             keepReachable(writer.get());
@@ -41,7 +43,7 @@ public:
     }
 
     /// \copydoc ZULMetaData::BaseMetaDataWriter::isHealthy
-    bool isHealthy() const override { return metaDataWriter_ && metaDataWriter_->getStream().good(); }
+    bool isHealthy() const override { return isStreamGood() && hasOnlyFiniteTimes_; }
 
     /// \copydoc ZULMetaData::BaseMetaDataWriter::entriesWritten
     std::uint64_t entriesWritten() const override { return entriesWritten_; }
@@ -53,16 +55,17 @@ public:
     void setMetaDataWriter(StreamWriter* writer) { metaDataWriter_ = writer; }
 
 protected:
-    /// Without a stream writer the entry is dropped.
+    /// Without a stream writer the entry is dropped. An entry at a time that is not finite is written as it is.
     void append(const typename Kind::Value& value, double seconds, bool flush) {
         if (metaDataWriter_)
             metaDataWriter_->write(seconds, value, flush);
+        hasOnlyFiniteTimes_ &= std::isfinite(seconds);
         countEntry();
     }
 
-    /// Called behind every entry, to count it where it was taken.
+    /// Called after every entry. Counts the entry if the stream accepted it.
     void countEntry() {
-        if (isHealthy())
+        if (isStreamGood())
             ++entriesWritten_;
     }
 
@@ -87,8 +90,11 @@ private:
             Destroyer()(writer);
     }
 
+    bool isStreamGood() const { return metaDataWriter_ && metaDataWriter_->getStream().good(); }
+
     StreamWriter* metaDataWriter_ = nullptr;
     std::uint64_t entriesWritten_ = 0;
+    bool hasOnlyFiniteTimes_ = true; // since the last `setup`
 };
 
 /// Any number of entries, each flushed unless `setFlushEveryWrite(false)` leaves that to the file buffer.
