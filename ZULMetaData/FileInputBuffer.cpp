@@ -83,7 +83,7 @@ FileInputBuffer::pos_type FileInputBuffer::seekpos(pos_type position, std::ios_b
     return file_.is_open() ? moveTo(position) : s_none;
 }
 
-/// The file follows when bytes are read, where it is known that it can.
+/// Defers the seek of the file until bytes are read, if the position is known to lie inside the file.
 FileInputBuffer::pos_type FileInputBuffer::moveTo(off_type position) {
     if (position < 0 || position > fileEnd_) {
         if (file_.pubseekpos(position) == s_none)
@@ -105,13 +105,13 @@ bool FileInputBuffer::catchUp() {
         return true;
     if (!file_.is_open())
         return false;
-    if (file_.pubseekpos(blockEnd_) == s_none) // as a failed read: the seek that it belongs to has passed for done
+    if (file_.pubseekpos(blockEnd_) == s_none) // reported here because the seek itself was deferred
         throw std::ios_base::failure("cannot be read", std::make_error_code(std::errc::io_error));
     filePosition_ = blockEnd_;
     return true;
 }
 
-/// Goes on from the end of the block.
+/// Reads the bytes that follow the block.
 std::size_t FileInputBuffer::read(char* bytes, std::size_t size) {
     filePosition_ = -1;
     const std::streamsize got = file_.sgetn(bytes, static_cast<std::streamsize>(size));
@@ -122,12 +122,12 @@ std::size_t FileInputBuffer::read(char* bytes, std::size_t size) {
 void FileInputBuffer::readBlock() {
     if (blockSize_ > s_smallestBlock) {
         if (!block_)
-            block_.reset(new char[s_largestBlock]); // not cleared: a walk never touches it
+            block_.reset(new char[s_largestBlock]); // not cleared: a walk over atoms never needs it
         try {
             setg(nullptr, nullptr, nullptr);
             const std::size_t got = read(block_.get(), blockSize_);
             setg(block_.get(), block_.get(), block_.get() + got);
-        } catch (const std::ios_base::failure&) { // what comes before the bad place is in reach of smaller blocks
+        } catch (const std::ios_base::failure&) { // smaller blocks still reach the bytes before the bad place
             blockSize_ = s_smallestBlock;
             if (!catchUp())
                 return;
@@ -138,7 +138,7 @@ void FileInputBuffer::readBlock() {
     blockSize_ = std::min(4 * blockSize_, s_largestBlock);
 }
 
-/// Lends the block of the file's own buffer.
+/// Uses the bytes in the file's own buffer in place.
 void FileInputBuffer::readSmallestBlock() {
     filePosition_ = -1;
     setg(nullptr, nullptr, nullptr);
@@ -150,7 +150,7 @@ void FileInputBuffer::readSmallestBlock() {
     leaveAt(blockEnd_ + static_cast<off_type>(size), size == 0);
 }
 
-/// A standard library may have to seek before it sees what is written behind an end that it has met.
+/// After the end of the file was met, a standard library may have to seek before it sees bytes that are written later.
 void FileInputBuffer::leaveAt(off_type position, bool isAtEnd) {
     blockEnd_ = position;
     filePosition_ = isAtEnd ? -1 : position;

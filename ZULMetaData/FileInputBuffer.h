@@ -12,13 +12,14 @@
 
 namespace ZULMetaData::detail {
 
-/// Stands between a stream and the buffer of its file; what the stream gives, and the state that it ends in, stay.
+/// Reads a file in larger blocks and seeks lazily. The stream on top returns the same bytes and ends in the same state
+/// as without this buffer.
 class FileInputBuffer final : public std::streambuf {
 public:
-    /// `file` is not open yet and outlives this. It is opened and closed as if it stood alone.
+    /// `file` must not be open yet, and must outlive this object. Open and close it as usual.
     explicit FileInputBuffer(std::filebuf& file);
 
-    /// To be called behind the closing of the file.
+    /// Call this after closing the file.
     void forget();
 
 protected:
@@ -42,12 +43,12 @@ private:
     void leaveAt(off_type position, bool isAtEnd);
 
     std::filebuf& file_;
-    std::array<char, s_smallestBlock> fileBlock_; // of `file_`
-    std::unique_ptr<char[]> block_;               // for all but the smallest
+    std::array<char, s_smallestBlock> fileBlock_; // the buffer of `file_`
+    std::unique_ptr<char[]> block_;               // for larger blocks
     std::size_t blockSize_ = s_smallestBlock;
     off_type blockEnd_ = 0;
-    off_type filePosition_ = 0; // of `file_`; -1 where a failure or the end was met on the way
-    off_type fileEnd_ = -1;     // as it was last asked for
+    off_type filePosition_ = 0; // of `file_`; -1 after a failure or the end of the file
+    off_type fileEnd_ = -1;     // when it was last determined
 };
 
 } // namespace ZULMetaData::detail

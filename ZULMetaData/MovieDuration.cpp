@@ -10,7 +10,7 @@ namespace ZULMetaData {
 
 namespace {
 
-/// For `visitEach` to hand its items to.
+/// Returns the first item of a type. `visitEach` calls a function for each item until that returns false.
 template <class VisitEach>
 std::optional<ContainerItem> firstOfType(std::string_view type, VisitEach visitEach) {
     std::optional<ContainerItem> found;

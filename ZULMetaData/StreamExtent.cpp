@@ -23,7 +23,7 @@ void walkSizedEntries(StreamEntries& entries, StreamExtent& extent) {
     extent.end = entries.end();
 }
 
-/// A stream in memory refuses to be moved there; a file that refuses has failed.
+/// A stream in memory refuses to seek past its end, which is no failure. If a file refuses a seek, it has failed.
 bool isBehindEnd(std::istream& input, std::uint64_t position) {
     input.clear();
     const std::int64_t size = ParserUtil::calcFileSize(input);

@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Builds the documentation as a site in build/docs/html, and looks whether every link leads somewhere. Fails where a public
-# name is not described. Usage: scripts/docs.sh; BUILD names another folder than build/docs.
+# Builds the documentation as a site in build/docs/html, and checks that every link leads somewhere. Fails if a public
+# name has no description. Usage: scripts/docs.sh; the variable BUILD names a folder to use instead of build/docs.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 build=${BUILD:-build/docs}
@@ -20,17 +20,17 @@ echo "== the classes"
 api=$build/html/api
 mkdir -p "$api"
 headers=()
-for room in SharedDependencies ZULMetaData Platform ZULMetaDataBridge; do # those that are installed
-    mapfile -t names < <(sed -nE 's|^ +([A-Za-z0-9_/]+\.h)\)?$|\1|p' "$room/CMakeLists.txt")
-    headers+=("${names[@]/#/$room/}")
+for folder in SharedDependencies ZULMetaData Platform ZULMetaDataBridge; do # their headers are installed
+    mapfile -t names < <(sed -nE 's|^ +([A-Za-z0-9_/]+\.h)\)?$|\1|p' "$folder/CMakeLists.txt")
+    headers+=("${names[@]/#/$folder/}")
 done
 version=$(sed -nE 's/^project\(ZULMetaData VERSION ([0-9.]+).*/\1/p' CMakeLists.txt)
-# The links of the site, seen from the folder of the classes.
+# The links of the site, relative to the folder of the classes.
 sed "s|href=\"|&\$relpath^../|" Docs/site/links.html >"$build/links.html"
 sed -e "/{links}/{r $build/links.html" -e 'd}' Docs/site/header.html >"$build/header.html"
 ZULM_HEADERS="${headers[*]}" ZULM_VERSION=$version ZULM_API_FOLDER=$api ZULM_HTML_HEADER=$build/header.html ZULM_ROOT=$PWD \
     doxygen Docs/site/Doxyfile
-# Doxygen links to lists of classes that it leaves out since they are private.
+# Doxygen links to lists of classes that it leaves out because they are private.
 grep -lr 'href="#nested-classes"' "$api" | xargs grep -L 'name="nested-classes"' |
     xargs -r sed -i '/<a href="#nested-classes">/d'
 

@@ -1,7 +1,7 @@
-"""Says which links of a site lead nowhere: check_links.py FOLDER
+"""Reports the links of a site that lead nowhere: check_links.py FOLDER
 
-Follows every link to a file, and to a place in a page, and looks for pages of our own that nothing leads to. Needs no network: links
-to other sites are counted only.
+Follows every link to a file and to a place in a page, and reports pages that no link leads to. It needs no network:
+links to other sites are only counted.
 """
 
 import html.parser

@@ -1,7 +1,7 @@
-"""Writes what the pages of a site can be searched by: index_pages.py FOLDER
+"""Writes the search index of a site: index_pages.py FOLDER
 
-One row a heading: its page and place, its words, and the text below it. It is a script, not JSON, since a page that is
-opened as a file may not load anything else.
+The index has one row for each heading: its page and place, its words, and the text below it. It is a script and not
+JSON, because a page that is opened as a file may load nothing else.
 """
 
 import html.parser
@@ -11,7 +11,7 @@ import sys
 
 
 class Sections(html.parser.HTMLParser):
-    """The headings of a page with their text."""
+    """Collects the headings of a page with their text."""
 
     def __init__(self, page):
         super().__init__()

@@ -1,6 +1,6 @@
-"""Puts the pages of the site and what they show into a folder: stage.py FOLDER
+"""Copies the pages of the site, and the pictures and schemas that they show, into a folder: stage.py FOLDER
 
-A link to a page of the site stays one; a link to anything else of the project becomes its text.
+A link to a page of the site stays a link. A link to any other file of the project becomes plain text.
 """
 
 import os
@@ -23,7 +23,7 @@ SHOWN = (".png", ".json")
 
 
 def pages():
-    """The source of each page, and where it is in the site."""
+    """Returns the source of each page and its place in the site."""
     found = {ROOT / source: pathlib.PurePosixPath(place) for source, place in RENAMED.items()}
     found.update({page: pathlib.PurePosixPath(page.name) for page in sorted((ROOT / "Docs").glob("*.md"))})
     return found

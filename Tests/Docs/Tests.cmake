@@ -1,5 +1,5 @@
-# Every block of code in the pages is compiled and run, what is made from sources is compared with them, and the pages
-# about the house with its includes.
+# Compiles and runs every block of code in the pages, compares the generated parts of the pages with their sources, and
+# compares the includes of the source files with Docs/architecture.md.
 if(CMAKE_CROSSCOMPILING)
   return()
 endif()

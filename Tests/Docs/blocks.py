@@ -1,12 +1,12 @@
-"""The blocks of code in a page, for the tests that compile and run them.
+"""Compiles and runs the blocks of code in a page, for the tests.
 
-A block is C++, shell or Python by the word behind its first fence. A block of the language `text` that follows at once is
-what it prints. C++ without a `main` is the body of a function of its own, behind includes of its own.
+The word after the opening fence says whether a block is C++, shell or Python. If a block of the language `text` follows
+immediately, it is what the block must print. C++ without a `main` becomes the body of a function, after its includes.
 
-    blocks.py cpp PAGE OUTPUT    writes one source, which runs the block whose number it is given
-    blocks.py cmake PAGE PREFIX COMPILER    builds a program by each block of CMake, with what is installed in PREFIX
-    blocks.py run PAGE PROGRAM ZULM PYTHONPATH VIEWER    runs every block in a folder of recordings of its own; without
-        PYTHONPATH none of Python, and with VIEWER 0 no `zulm view`
+    blocks.py cpp PAGE OUTPUT    writes a program that runs the block at the line that is its argument
+    blocks.py cmake PAGE PREFIX COMPILER    builds a program with each block of CMake and the library in PREFIX
+    blocks.py run PAGE PROGRAM ZULM PYTHONPATH VIEWER    runs every block in its own folder of recordings. Skips Python
+        if PYTHONPATH is empty, and `zulm view` if VIEWER is 0
 """
 
 import os
@@ -21,7 +21,7 @@ FENCE = re.compile(r"^```(\w*)\n(.*?)^```$", re.MULTILINE | re.DOTALL)
 ROOT = pathlib.Path(__file__).resolve().parents[2]
 TESTED = ("cpp", "sh", "python")
 OTHERS = ("text", "cmake", "js")
-# 1: a file could not be read; 2: wrong usage. The others tell what was found.
+# 1 means that a file could not be read, 2 wrong usage. The other exit codes say what was found.
 FINE = (0, 3, 4)
 
 
@@ -43,14 +43,14 @@ def blocks_of(page):
             blocks[-1].printed = block.code
         elif block.language in TESTED:
             blocks.append(block)
-        elif block.language not in OTHERS and page.name != "tool.md":  # whose lines of usage are no commands
-            sys.exit(f"{page}:{block.line}: of which language is this block?")
+        elif block.language not in OTHERS and page.name != "tool.md":  # its lines of usage are not commands
+            sys.exit(f"{page}:{block.line}: this block names no known language")
         end_of_last = found.end()
     return blocks
 
 
 def cpp_source(page):
-    """A `main` becomes a function like any other block."""
+    """Turns each block, with or without a `main`, into a function."""
     includes = ['#include "ZULMetaDataBridge/ZULMetaDataBridge.h"', "#include <filesystem>", "#include <fstream>",
                 "#include <iostream>", "#include <memory>", "#include <string>", "#include <vector>"]
     bodies, calls = [], []
@@ -71,7 +71,7 @@ def cpp_source(page):
 
 
 def build_by_cmake(page, prefix, compiler):
-    """The block links a program that uses the headers."""
+    """Builds a program that uses the headers with each block."""
     built = 0
     for found in re.finditer(r"^```cmake\n(.*?)^```$", page.read_text(encoding="utf-8"), re.MULTILINE | re.DOTALL):
         (target,) = re.findall(r"target_link_libraries\((\w+)", found[1])
@@ -90,7 +90,7 @@ def build_by_cmake(page, prefix, compiler):
 
 
 def make_recordings(folder, zulm):
-    """What the blocks speak of: the demo's recording and its stream files, a movie without metadata, a damaged one."""
+    """Makes the files that the blocks name: the demo's recording and streams, a movie without metadata, a damaged one."""
     subprocess.run([zulm, "demo", "demo"], check=True, cwd=folder, stdout=subprocess.DEVNULL)
     recording = (folder / "demo" / "Recording.mp4").read_bytes()
     metadata = recording.index(b"ZULM") - 4
@@ -106,7 +106,7 @@ def make_recordings(folder, zulm):
 
 
 def shell_lines(code):
-    """One command a line; what a command is to write must not be there."""
+    """Yields one command for each line."""
     for line in code.splitlines():
         command = line.split("#")[0].strip() if "'" not in line else line.strip()
         if command:
@@ -117,9 +117,9 @@ def run_shell(block, folder, environment, has_viewer):
     printed = ""
     for command in shell_lines(block.code):
         script = command.split()[0]
-        if re.match(r"scripts/|cmake |ctest ", command) or re.search(r"\b(pip|venv)\b", command):  # other tests do
+        if re.match(r"scripts/|cmake |ctest ", command) or re.search(r"\b(pip|venv)\b", command):  # other tests run these
             if script.startswith("scripts/") and not os.access(ROOT / script, os.X_OK):
-                return f"{script} is no script", printed
+                return f"{script} is not a script", printed
             continue
         if "zulm view" in command and not has_viewer:
             continue

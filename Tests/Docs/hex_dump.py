@@ -1,6 +1,6 @@
-"""Prints a recording byte by byte, with what each stretch of bytes is: hex_dump.py MOVIE
+"""Prints a recording byte by byte, and what the bytes mean: hex_dump.py MOVIE
 
-Knows the format from Docs/format.md alone, and nothing of the library. Of many entries it shows the first two.
+Knows the format from Docs/format.md alone, and does not use the library. Shows only the first two entries of a stream.
 """
 
 import pathlib
@@ -8,7 +8,7 @@ import struct
 import sys
 
 SHOWN_ENTRIES = 2
-KINDS = {  # by the first four bytes of the identifier: name, and the layout of a value of one size
+KINDS = {  # first four bytes of the identifier: name, and the layout of a value of fixed size
     "2b7b6af2": ("cursorLocation", "ii"),
     "2b7b6af8": ("slideTitles", None),
     "2b7b6af1": ("cursorImage", None),
@@ -22,7 +22,7 @@ class Dump:
         self.position = 0
 
     def take(self, size, meaning, limit=16):
-        """Prints `size` bytes in lines of eight, at most `limit` of them, and gives them all."""
+        """Prints `size` bytes in lines of eight, at most `limit` of them, and returns all of them."""
         taken = self.data[self.position:self.position + size]
         if len(taken) < size:
             sys.exit(f"the file ends at {len(self.data)}, inside {meaning}")
@@ -45,7 +45,7 @@ class Dump:
         return value
 
     def atom(self, indent=""):
-        """Gives the type and where the atom ends."""
+        """Prints the header of an atom, and returns its type and where the atom ends."""
         start = self.position
         size = self.number(">I", f"{indent}size of the atom, " + "{}")
         kind = self.take(4, f"{indent}type, {self.data[start + 4:start + 8].decode()}").decode()

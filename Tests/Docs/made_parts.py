@@ -1,4 +1,7 @@
-"""Compares the parts of Docs/format.md that are made with what they are made from: made_parts.py ZULM [update]"""
+"""Compares the generated parts of Docs/format.md with their sources: made_parts.py ZULM [update]
+
+With `update` it writes them.
+"""
 
 import pathlib
 import re
@@ -13,7 +16,7 @@ STREAMS = ("cursorLocation", "slideTitles", "cursorImage")
 
 
 def kinds():
-    """The registry of the kinds, and the value of each that is recorded."""
+    """Yields the table of the kinds, with the value of each kind that is recorded."""
     registry = (ROOT / "ZULMetaData" / "ZULMMetaDataUUIDs.h").read_text()
     recorded = (ROOT / "ZULMetaDataBridge" / "Source" / "MetaDataKinds.h").read_text()
     groups = dict(re.findall(r"uuid (s_\w+UUID) = detail::kindUUID\(0x(\w{8})\)", registry))
@@ -44,7 +47,7 @@ def replaced(page, mark, lines):
     pattern = re.compile(rf"(<!-- {mark} begins? -->\n).*?(<!-- {mark} ends? -->)", re.DOTALL)
     changed, count = pattern.subn(lambda match: match[1] + "\n".join(lines) + "\n" + match[2], page)
     if count != 1:
-        sys.exit(f"{PAGE}: has no marks for the {mark}")
+        sys.exit(f"{PAGE}: has no markers for {mark}")
     return changed
 
 
@@ -54,7 +57,7 @@ def main():
     if made == page:
         return
     if sys.argv[2:] != ["update"]:
-        sys.exit(f"{PAGE.name} shows what is not so any more: run {pathlib.Path(__file__).name} ZULM update")
+        sys.exit(f"{PAGE.name} is out of date: run {pathlib.Path(__file__).name} ZULM update")
     PAGE.write_text(made)
 
 

@@ -21,11 +21,12 @@ namespace {
 
 constexpr std::size_t s_blockSize = 4 << 20;
 
-/// What all registered identifiers end with.
+/// All registered identifiers differ in their first group and share the rest, the tail.
 constexpr std::size_t s_groupSize = 4;
 constexpr std::size_t s_tailSize = sizeof(uuid) - s_groupSize;
 
-/// Bytes in front of an identifier's tail that tell what is around the stream, and from the tail to the header's end.
+/// How many bytes before an identifier's tail show what contains the stream, and how many the header has from the tail
+/// on.
 constexpr std::size_t s_before = detail::s_extendedAtomHeaderSize + s_groupSize;
 constexpr std::size_t s_behind = s_metaDataHeaderSize - s_groupSize;
 
@@ -33,7 +34,7 @@ std::string_view tailOfIdentifiers() {
     return {reinterpret_cast<const char*>(s_metaDataKinds.front().type.data) + s_groupSize, s_tailSize};
 }
 
-/// No recording began a day before its time line or lasts ten years.
+/// Assumes that no entry is more than a day before the start of its recording, or ten years after it.
 bool canBeTime(double seconds) {
     constexpr double day = 86400;
     return std::isfinite(seconds) && seconds >= -day && seconds < 3652 * day;
@@ -45,7 +46,8 @@ std::optional<double> timeOf(std::string_view bytes) {
     return decoded ? std::optional<double>(decoded->time) : std::nullopt;
 }
 
-/// Of a kind that is registered, but whose values nobody here reads: they are one of those that there are.
+/// Returns whether `bytes` are an entry with a value of one of the types. The library does not know the type of a kind
+/// that is registered but never decoded, so it tries them all.
 template <class... Values>
 bool isEntryOfAny(const MetaDataHeader& header, std::string_view bytes) {
     const auto isOne = [&]<class Value>() {
@@ -80,18 +82,18 @@ Number numberAt(std::string_view bytes, std::size_t offset) {
     return number;
 }
 
-/// The header of a DATA atom or chunk, in front of a stream.
+/// The header of a DATA atom or chunk, which comes before a stream.
 struct DataHeader {
     std::uint64_t size = 0; ///< its own
     std::uint64_t payload = 0;
 };
 
-/// What is read at once of `size` bytes.
+/// Returns how many of `size` bytes are read at once.
 std::size_t blockSizeFor(std::uint64_t size) {
     return static_cast<std::size_t>(std::min<std::uint64_t>(size, s_blockSize));
 }
 
-/// What `before` ends with, in one of its three forms.
+/// Returns the DATA header at the end of `before`, which may have any of its three forms.
 std::optional<DataHeader> dataHeaderAtEndOf(std::string_view before) {
     using namespace detail;
     constexpr std::uint32_t type = swapInt(s_streamAtom); // as it is stored
