@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
-# Measures what a user does beside a raw baseline in the same run, and prints one table. Ends with 1 where a target is
-# missed by more than a tenth. Usage: scripts/bench.sh [TASK] [--document]
-# TASK measures only what has that text in its name; --document puts the table into Docs/performance.md.
+# Measures what users do, each task beside a raw baseline in the same run, and prints one table. Ends with 1 if a target
+# is missed by more than a tenth. Usage: scripts/bench.sh [TASK] [--document]
+# With TASK it measures only tasks whose name contains that text. --document writes the table into Docs/performance.md.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 

@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
-# Fails where programs that were linked against the shared libraries as packaging/abi describes them would not work with
-# these. Usage: scripts/check-abi.sh [update]; update describes them anew, after a release or where ZULMETADATA_ABI_VERSION
-# has gone up. The descriptions are of x86-64 and Debian's compiler.
+# Fails if programs that were linked with the shared libraries that packaging/abi describes would not work with the
+# current ones. Usage: scripts/check-abi.sh [update]; update writes new descriptions, after a release or after
+# ZULMETADATA_ABI_VERSION was raised. The descriptions are for x86-64 and Debian's compiler.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 build=${BUILD:-build/abi}

@@ -1,5 +1,5 @@
 #!/usr/bin/env bash
-# Makes a movie of 20 seconds that looks like the screen of the simulated session: its windows where it says they were.
+# Makes a movie of 20 seconds that looks like the screen of the simulated session, with its windows in the right places.
 # Usage: scripts/desktop-movie.sh MOVIE
 set -euo pipefail
 movie=$1

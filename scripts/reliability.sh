@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
-# Proves that nothing recorded is lost and nothing that is opened does harm: runs every check of Tests/Reliability and
-# prints one table. Usage: scripts/reliability.sh [quick|full] [CHECK...] [--document]
-# quick takes minutes, full an hour or more; --document puts the table into Docs/reliability.md.
+# Checks that recorded data is not lost and that hostile files do no harm: runs every check of Tests/Reliability and prints
+# one table. Usage: scripts/reliability.sh [quick|full] [CHECK...] [--document]
+# quick takes minutes, full an hour or more. --document writes the table into Docs/reliability.md.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
