@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Compiles and links the libraries, the tool and the examples for macOS on both of its processors, with warnings as errors.
-# It runs none of them, because that needs a Mac.
+# Compiles and links the libraries, the tool and the examples for macOS on both of its processors, with warnings as
+# errors. It runs none of them, because that needs a Mac.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 

@@ -2,8 +2,8 @@
 # Shows how much of the library its own tests run: lines and branches of ZULMetaData/ and ZULMetaDataBridge/. Fails
 # below 97 % of the lines or 90 % of the branches. Usage: scripts/coverage.sh [--html FOLDER]
 #
-# Branches that only an exception takes are not counted. The compiler marks those that leave a call. It does not mark those
-# in cleanup code that is shared with the normal path, but they are on lines without a condition.
+# Branches that only an exception takes are not counted. The compiler marks those that leave a call. It does not mark
+# those in cleanup code that is shared with the normal path, but they are on lines without a condition.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 

@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
-# Builds the Debian packages in build/package and installs them into a fresh Debian with g++ and nothing else. Compiles the
-# README's example there, and looks into its recording with zulm. Usage: scripts/package.sh [OPTION...]; each OPTION is
-# passed to cmake. The variable BUILD names a folder to use instead of build/package.
+# Builds the Debian packages in build/package and installs them into a fresh Debian with g++ and nothing else. Compiles
+# the README's example there, and looks into its recording with zulm. Usage: scripts/package.sh [OPTION...]; each OPTION
+# is passed to cmake. The variable BUILD names a folder to use instead of build/package.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 build=${BUILD:-build/package}

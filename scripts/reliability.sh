@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
-# Checks that recorded data is not lost and that hostile files do no harm: runs every check of Tests/Reliability and prints
-# one table. Usage: scripts/reliability.sh [quick|full] [CHECK...] [--document]
+# Checks that recorded data is not lost and that hostile files do no harm: runs every check of Tests/Reliability and
+# prints one table. Usage: scripts/reliability.sh [quick|full] [CHECK...] [--document]
 # quick takes minutes, full an hour or more. --document writes the table into Docs/reliability.md.
 set -euo pipefail
 cd "$(dirname "$0")/.."
