@@ -7,10 +7,7 @@ function(zulm_add_test path)
   add_executable(${name} ${path}.cpp)
   target_link_libraries(${name} PRIVATE ZULMetaDataTestSupport)
   zulm_project_options(${name})
-  target_precompile_headers(${name} REUSE_FROM ZULMetaDataTestSupport)
-  # Without these, ccache keeps nothing that was compiled with a precompiled header.
-  target_compile_options(${name} PRIVATE
-    $<$<CXX_COMPILER_ID:GNU>:-fpch-preprocess> "$<$<CXX_COMPILER_ID:Clang>:SHELL:-Xclang -fno-pch-timestamp>")
+  zulm_reuse_precompiled_headers(${name} ZULMetaDataTestSupport)
   if(CMAKE_CROSSCOMPILING_EMULATOR)
     # All at once: an emulator is slow to start. It does not know a limit on its programs' memory.
     add_test(NAME ${name} COMMAND ${name} --gtest_filter=-ScarceMemory.*)

@@ -15,3 +15,22 @@ function(zulm_project_options target)
     target_link_options(${target} PUBLIC --coverage)
   endif()
 endfunction()
+
+# Without these options, ccache keeps nothing that was compiled with a precompiled header.
+function(zulm_cache_precompiled_headers target)
+  target_compile_options(${target} PRIVATE
+    $<$<CXX_COMPILER_ID:GNU>:-fpch-preprocess> "$<$<CXX_COMPILER_ID:Clang>:SHELL:-Xclang -fno-pch-timestamp>")
+endfunction()
+
+# zulm_precompile_headers(TARGET HEADER...): compiles headers of other projects once for all sources of TARGET. A source
+# still includes what it uses, since builds without precompiled headers must work too.
+function(zulm_precompile_headers target)
+  target_precompile_headers(${target} PRIVATE ${ARGN})
+  zulm_cache_precompiled_headers(${target})
+endfunction()
+
+# zulm_reuse_precompiled_headers(TARGET OTHER): takes the headers that OTHER has compiled with the same options.
+function(zulm_reuse_precompiled_headers target other)
+  target_precompile_headers(${target} REUSE_FROM ${other})
+  zulm_cache_precompiled_headers(${target})
+endfunction()
