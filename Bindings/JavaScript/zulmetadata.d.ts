@@ -1,77 +1,95 @@
-/** What a stream holds, without its entries. */
+/** Describes a stream without its entries. */
 export interface StreamSummary {
-  /** The name of its kind, such as "cursorLocation", or its identifier where that has no name. */
+  /** The name of the kind, such as "cursorLocation", or the identifier if the kind has no name. */
   kind: string;
-  /** Its identifier. */
+  /** The identifier of the kind. */
   uuid: string;
+  /** The version of the entries. */
   version: number;
-  /** Whole entries; 0 where they cannot be decoded. */
+  /** The number of whole entries; 0 if they cannot be decoded. */
   entries: number;
-  /** What the file says it takes, header included. */
+  /** The size that the file declares for the stream, in bytes, header included. */
   bytes: number;
-  /** Of its header, from the start of the file. */
+  /** The position of the stream's header in the file. */
   offset: number;
-  /** Seconds, of the first and the last entry with a finite time. */
+  /** The time in seconds of the first entry whose time is finite. */
   first?: number;
+  /** The time in seconds of the last entry whose time is finite. */
   last?: number;
-  /** Whether `entries()` can decode it: the kind and its version are known. */
+  /** True if the kind and its version are known, so that `entries()` can decode the stream. */
   known: boolean;
 }
 
-/** One value per entry. Texts and bytes that are the same share one object. */
+/** One value for each entry. Texts and bytes that are equal share one object. */
 export type Column = Float64Array | Int32Array | BigInt64Array | Uint32Array | string[] | (Uint8Array | null)[];
 
 /** The entries of a stream, by columns. */
 export interface Entries {
+  /** The kind of the stream. */
   kind: string;
-  /** Seconds, as they are stored. */
+  /** The times in seconds, as they are stored. */
   time: Float64Array;
   /**
-   * By the names that `zulm dump` uses, in its order. Whole numbers are Int32Array, identifiers of cursor images
-   * BigInt64Array, other numbers Float64Array with the values that `zulm dump --format json` prints; texts are always
-   * valid, with U+FFFD in place of what is not, and empty where there is none. An image is its stored file, PNG or
-   * TIFF, and null where an entry has none.
+   * The values, by the names that `zulm dump` uses and in its order.
+   *
+   * Whole numbers are an Int32Array, identifiers of cursor images a BigInt64Array, and other numbers a Float64Array with
+   * the values that `zulm dump --format json` prints. Texts are always valid: U+FFFD takes the place of bytes that are
+   * not UTF-8, and a missing text is empty. An image is the stored PNG or TIFF file, or null if the entry has none.
    */
   columns: Record<string, Column>;
 }
 
-/** A recording that is open. Reads what it is asked for, and keeps nothing of the file but a few blocks. */
+/** A source of bytes that you write yourself, for example over an archive or a cache. */
+export interface ByteSource {
+  /** The number of bytes. */
+  readonly size: number;
+  /**
+   * Returns the `size` bytes at `position`, or fewer if the source ends before. It must return them at once, not a
+   * promise. What it throws ends the operation with a `ZulmError`.
+   */
+  read(position: number, size: number): Uint8Array;
+  /** Called once, when the recording is closed or could not be opened. */
+  close?(): void;
+}
+
+/** An open recording. It reads what it is asked for, and keeps nothing of the file but a few blocks. */
 export class Recording {
   /**
-   * Recognises movies (mp4, mov), RIFF files (avi, wav) and bare stream files, by the extension of the name where that
-   * tells it, else by the first bytes. Rejects with a `ZulmError` for anything else.
+   * Opens a movie (mp4, mov), a RIFF file (avi, wav) or a stream file. The extension of the name decides which; if it
+   * is not known, the first bytes do. Rejects with a `ZulmError` for anything else.
    *
-   * In a worker a `Blob` is read in slices, so that it may be of any size. Elsewhere it is loaded as a whole.
+   * A worker reads a `Blob` in slices, so it can be of any size; elsewhere a `Blob` is loaded as a whole. A `ByteSource`
+   * is always read in slices. In Node, `openFile` of `zulmetadata/node` reads a file in slices.
    *
-   * @param name what reports call it; the file's own name where none is given, "recording" where it has none either.
+   * @param name what reports call the recording; by default the name of the file, or "recording" if it has none.
    */
-  static open(source: Blob | Uint8Array, name?: string): Promise<Recording>;
+  static open(source: Blob | Uint8Array | ByteSource, name?: string): Promise<Recording>;
 
   /** "movie", "RIFF" or "stream". */
   readonly container: string;
-  /** Seconds, where the movie tells. */
+  /** The duration in seconds, if the movie declares one. */
   readonly duration?: number;
-  /** In the order of their identifiers. */
+  /** The streams, in the order of their identifiers. */
   readonly streams: StreamSummary[];
   /**
-   * Streams that the file holds and no reader finds, in its order: a later one of the kind took their place, or they lie
-   * behind damage.
+   * The streams that readers do not find, in the order of the file: a later stream of the same kind hides them, or
+   * they lie after damage.
    */
   readonly hidden: StreamSummary[];
 
-  /** Of the stream of this kind, or with this identifier. Throws a `ZulmError` where there is none. */
+  /** Returns the entries of the stream of this kind or identifier. Throws a `ZulmError` if there is none. */
   entries(kind: string): Entries;
-  /** Of a hidden stream, by its place among `hidden`. */
+  /** Returns the entries of a hidden stream, by its index in `hidden`. */
   hiddenEntries(index: number): Entries;
-  /** The file's object of `zulm info --json`. */
+  /** Returns the file's object of `zulm info --json`. */
   info(): object;
-  /** The file's object of `zulm verify --json`. */
+  /** Returns the file's object of `zulm verify --json`. */
   verify(): object;
-  /** What `zulm dump --format json` prints, of all streams or of these kinds alone. */
+  /** Returns what `zulm dump --format json` prints, for all streams or for these kinds only. */
   dump(kinds?: string[]): string;
-  /** Frees everything. Whatever was given out stays valid. */
+  /** Frees everything and closes the source. What was returned before stays valid. */
   close(): void;
 }
 
-/** Why something could not be done, in words for a person. */
+/** Says in words for a person why something could not be done. */
 export class ZulmError extends Error {}

@@ -23,10 +23,11 @@ function compiledCore() {
   return compiled;
 }
 
-/** What can be read at any position: of a file in a worker its slices, else everything at once. */
+/** Returns what can be read at any position. A worker reads slices of a Blob; elsewhere a Blob is loaded as a whole. */
 async function readerOf(source) {
   if (source instanceof Uint8Array) return readerOfBytes(source);
-  if (!(source instanceof Blob)) throw new ZulmError('a recording is opened from a Blob or a Uint8Array');
+  if (typeof source?.read === 'function' && Number.isSafeInteger(source.size)) return source;
+  if (!(source instanceof Blob)) throw new ZulmError('a recording is opened from a Blob, a Uint8Array or a source of bytes');
   if (typeof FileReaderSync === 'undefined') return readerOfBytes(new Uint8Array(await source.arrayBuffer()));
   const reader = new FileReaderSync();
   const read = (position, size) => new Uint8Array(reader.readAsArrayBuffer(source.slice(position, position + size)));
@@ -52,6 +53,8 @@ class Core {
     const readAt = (position, place, size) => {
       try {
         const bytes = reader.read(position, size >>> 0);
+        if (!(bytes instanceof Uint8Array) || bytes.length > size >>> 0)
+          throw new TypeError('read(position, size) must return a Uint8Array of at most that size');
         new Uint8Array(this.memory).set(bytes, place >>> 0);
         return bytes.length;
       } catch (error) {
@@ -215,24 +218,31 @@ export class Recording {
   #core;
   #handle;
   #name;
+  #reader;
 
   static async open(source, name = source?.name || 'recording') {
     const reader = await readerOf(source);
-    return new Recording(await Core.over(reader), reader.size, name);
+    try {
+      return new Recording(await Core.over(reader), reader, name);
+    } catch (error) {
+      reader.close?.();
+      throw error;
+    }
   }
 
-  constructor(core, size, name) {
+  constructor(core, reader, name) {
     if (!(core instanceof Core)) throw new TypeError('Recording.open() opens recordings');
     this.#core = core;
     this.#name = name;
     this.#guarded(() => {
-      this.#handle = core.withText(name, (place) => core.call('zulm_open_host', size, place));
+      this.#handle = core.withText(name, (place) => core.call('zulm_open_host', reader.size, place));
       this.container = core.textAt(core.exports.zulm_container(this.#handle));
       const duration = core.exports.zulm_duration(this.#handle);
       if (!Number.isNaN(duration)) this.duration = duration;
       this.streams = core.streamsOf(this.#handle, 'zulm_stream');
       this.hidden = core.streamsOf(this.#handle, 'zulm_hidden');
     });
+    this.#reader = reader; // a recording that is open closes it
   }
 
   entries(kind) {
@@ -267,6 +277,9 @@ export class Recording {
 
   close() {
     this.#core = undefined; // and with it all memory
+    const reader = this.#reader;
+    this.#reader = undefined;
+    reader?.close?.();
   }
 
   /** Nothing but a `ZulmError` comes out; a core that broke is not used again. */

@@ -27,6 +27,8 @@ test('exports the functions that its types describe, and no others', async () =>
   const described = [...types.matchAll(/^export class (\w+)/gm)].map(([, name]) => name);
   for (const name of ['zulmetadata.js', 'zulmetadata.single.js'])
     assert.deepEqual(Object.keys(await load(name)).sort(), described.sort());
+  const functions = readFileSync(join(packageFolder, 'node.d.ts'), 'utf8').matchAll(/^export function (\w+)/gm);
+  assert.deepEqual(Object.keys(await load('node.js')), [...functions].map(([, name]) => name));
 });
 
 test('describes every member of a recording', async () => {

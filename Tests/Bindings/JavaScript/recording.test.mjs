@@ -132,7 +132,7 @@ test('says in words what it cannot do', async () => {
     Recording.open(new Uint8Array(100), 'notes.txt'),
     said('notes.txt: begins neither like a movie, nor a RIFF file, nor a stream'),
   );
-  await assert.rejects(Recording.open('Recording.mp4'), said('a recording is opened from a Blob or a Uint8Array'));
+  await assert.rejects(Recording.open('Recording.mp4'), said('a recording is opened from a Blob, a Uint8Array or a source of bytes'));
   const recording = await Recording.open(bytesOf(movie), 'Mine.mp4');
   assert.throws(() => recording.entries('caretPosition'), said('Mine.mp4: holds no stream caretPosition'));
   assert.throws(() => recording.dump(['nothing']), said('Mine.mp4: holds no stream nothing'));

@@ -1,12 +1,16 @@
-// Large movies, which a worker reads in slices. Node has no reader for that; this one reads from a file.
+// Large movies, which are read in slices: by a worker, in Node, and from a source of the caller. Node has no reader of
+// workers; the one here reads from a file.
 
 import assert from 'node:assert/strict';
-import { closeSync, ftruncateSync, openSync, readSync, statSync, writeSync } from 'node:fs';
+import { closeSync, ftruncateSync, openSync, readdirSync, readSync, statSync, writeFileSync, writeSync } from 'node:fs';
+import { open } from 'node:fs/promises';
 import { join } from 'node:path';
 import { after, before, test } from 'node:test';
+import { pathToFileURL } from 'node:url';
 import { bytesOf, load, recordedSession, temporaryFolder, zulm } from './support.mjs';
 
-const { Recording } = await load('zulmetadata.js');
+const { Recording, ZulmError } = await load('zulmetadata.js');
+const { openFile } = await load('node.js');
 const folder = temporaryFolder(after);
 const { movie } = recordedSession(folder);
 
@@ -72,4 +76,75 @@ test('reads the same in slices as at once', async () => {
   const whole = await Recording.open(bytesOf(movie), movie);
   assert.equal(sliced.dump(), whole.dump());
   assert.deepEqual(sliced.verify(), whole.verify());
+});
+
+const openFiles = () => readdirSync('/proc/self/fd').length;
+
+test('Node reads a movie of 10 GiB from its file', async () => {
+  const path = movieOf(10 * 2 ** 30);
+  const before = openFiles();
+  for (const file of [path, pathToFileURL(path)]) {
+    const recording = await openFile(file);
+    assert.equal(openFiles(), before + 1);
+    assert.equal(recording.dump(), zulm('dump', '--format', 'json', path).stdout);
+    recording.close();
+    recording.close();
+    assert.equal(openFiles(), before);
+    assert.throws(() => recording.info(), ZulmError);
+  }
+});
+
+test('Node leaves a handle that is open to whoever opened it', async () => {
+  const handle = await open(movie);
+  const recording = await openFile(handle, 'session.mp4');
+  assert.equal(recording.info().path, 'session.mp4');
+  assert.equal(recording.dump(), (await Recording.open(bytesOf(movie), 'session.mp4')).dump());
+  recording.close();
+  assert.equal((await handle.stat()).size, statSync(movie).size);
+  await handle.close();
+});
+
+test('Node closes what turns out to be no recording, and says which it was', async () => {
+  const before = openFiles();
+  const text = join(folder, 'text.txt');
+  writeFileSync(text, Buffer.alloc(5000, 1));
+  for (const path of [text, folder, join(folder, 'missing.mp4')])
+    await assert.rejects(openFile(path), (error) => error instanceof ZulmError && error.message.includes(path));
+  assert.equal(openFiles(), before);
+});
+
+test('reads from a source of the caller, and closes it once', async () => {
+  const bytes = bytesOf(movie);
+  const reads = [];
+  let closed = 0;
+  const source = {
+    size: bytes.length,
+    read: (position, size) => (reads.push(size), bytes.subarray(position, position + size)),
+    close: () => ++closed,
+  };
+  const recording = await Recording.open(source, 'session.mp4');
+  assert.equal(recording.streams.length, 17);
+  assert.ok(reads.length > 0 && Math.max(...reads) <= 2 ** 16, `${reads}`);
+  recording.close();
+  recording.close();
+  assert.equal(closed, 1);
+  const noRecording = (position, size) => new Uint8Array(size).fill(1);
+  await assert.rejects(Recording.open({ ...source, read: noRecording }), ZulmError);
+  assert.equal(closed, 2);
+});
+
+test('a source that does not return bytes is refused, and what it throws is the cause', async () => {
+  const failure = new Error('the archive is broken');
+  const fail = () => {
+    throw failure;
+  };
+  for (const [read, isCause] of [
+    [fail, (cause) => cause === failure],
+    [async () => new Uint8Array(8), (cause) => cause instanceof TypeError],
+    [(position, size) => new Uint8Array(size + 1), (cause) => cause instanceof TypeError],
+  ])
+    await assert.rejects(Recording.open({ size: 1000, read }, 'a.mp4'), (error) => {
+      assert.ok(error instanceof ZulmError, error);
+      return isCause(error.cause);
+    });
 });
