@@ -6,9 +6,9 @@
     cursor = recording["cursorLocation"]        # a NumPy array of records
     print(len(cursor), cursor["time"][0], cursor["x"].max())
 
-A `Recording` looks for the streams of a file once, when it is made; their bytes are read anew each time that entries
-are asked for. Of a file that was changed since, make another one. What goes wrong with a file is an `OSError`, what is
-wrong with an argument a `ValueError`, `TypeError` or `KeyError`; a movie that could not be changed is a `SaveError`.
+A `Recording` looks for the streams of a file once, when it is created, and reads their bytes each time you ask for
+entries. Open the file again after it changes. A problem with a file raises an `OSError`, a wrong argument a
+`ValueError`, `TypeError` or `KeyError`, and a movie that could not be changed a `SaveError`.
 """
 
 from __future__ import annotations
@@ -16,7 +16,7 @@ from __future__ import annotations
 import os
 from collections.abc import Iterable, Iterator, Mapping
 from types import TracebackType
-from typing import Any, Union
+from typing import Any, Union, cast
 
 from . import _core
 from ._core import (
@@ -38,15 +38,17 @@ from ._core import (
     recorded_kinds,
     verify,
 )
+from ._entries import Entries as _Entries
 from ._entries import Records as _Records
-from ._entries import Rows as _Rows
 from ._entries import records_of as _records_of
+from ._kinds import Kind
 
 __all__ = [
     "Attached",
     "AttachedStream",
     "Creator",
     "Finding",
+    "Kind",
     "RecordedStream",
     "Recording",
     "Repair",
@@ -71,16 +73,20 @@ __all__ = [
 _Path = Union[str, "os.PathLike[str]"]
 
 
-class Recording(Mapping[str, _Records]):
-    """A movie, RIFF file or stream file: the entries of each stream by the name of its kind.
+class Recording(Mapping[Kind, _Records]):
+    """A movie, RIFF file or stream file. It maps the name of each kind to the entries of its stream.
 
-    Entries are read anew each time they are asked for, from where the stream was when the `Recording` was made, and are
-    the caller's. Only streams that can be decoded are in the mapping; `streams` has all of them.
+    Entries are read each time you ask for them, from where the stream was when the `Recording` was created. The arrays
+    are yours. The mapping has only the streams that can be decoded; `streams` has all of them.
+
+    A `Recording` can be used in a `with` statement and can be pickled. A pickle holds the absolute path of the file,
+    not its contents; the file is opened again when the pickle is loaded.
     """
 
     def __init__(self, path: _Path) -> None:
         self._file = _core.RecordingFile(os.fspath(path))
-        self._decodable = {stream.kind: stream for stream in self._file.streams if stream.is_decodable}
+        self._decodable = {cast(Kind, stream.kind): stream for stream in self._file.streams if stream.is_decodable}
+        self._closed = False
         self.path = path
 
     @property
@@ -90,26 +96,38 @@ class Recording(Mapping[str, _Records]):
 
     @property
     def duration(self) -> float | None:
-        """Seconds, as the movie declares them; None where it does not."""
+        """The duration in seconds that the movie declares, or None if it declares none."""
         return self._file.duration
 
     @property
     def creators(self) -> list[Creator]:
-        """Who stamped the movie, in the order of the file: the last one was stamped last."""
+        """The stamps of the movie, in the order of the file. The last one is the newest."""
         return self._file.creators
 
     @property
     def streams(self) -> list[RecordedStream]:
-        """Every stream, decodable or not, in the order of their identifiers."""
+        """All streams, decodable or not, in the order of their identifiers."""
         return self._file.streams
 
-    def __getitem__(self, kind: str) -> _Records:
+    def close(self) -> None:
+        """Ends the use of the recording: asking for entries raises a `ValueError` afterwards. May be called more than
+        once. Arrays that were read stay valid. No file is kept open before this either."""
+        self._closed = True
+
+    @property
+    def closed(self) -> bool:
+        """True after `close`."""
+        return self._closed
+
+    def __getitem__(self, kind: Kind) -> _Records:
+        if self._closed:
+            raise ValueError(f"{os.fspath(self.path)}: the recording is closed")
         return self._decodable[kind].read()
 
     def __contains__(self, kind: object) -> bool:
         return kind in self._decodable
 
-    def __iter__(self) -> Iterator[str]:
+    def __iter__(self) -> Iterator[Kind]:
         return iter(self._decodable)
 
     def __len__(self) -> int:
@@ -118,27 +136,39 @@ class Recording(Mapping[str, _Records]):
     def __repr__(self) -> str:
         return f"<{self.container} {os.fspath(self.path)!r}: {', '.join(self) or 'no metadata'}>"
 
+    def __enter__(self) -> Recording:
+        return self
+
+    def __exit__(
+        self, kind: type[BaseException] | None, error: BaseException | None, trace: TracebackType | None
+    ) -> None:
+        self.close()
+
+    def __reduce__(self) -> tuple[type[Recording], tuple[str]]:
+        return type(self), (os.path.abspath(os.fspath(self.path)),)
+
 
 _SOURCE_TYPES = (str, os.PathLike, RecordedStream, Recording)
 _Source = Union[_Path, RecordedStream, Recording]
 
 
 class StreamWriter:
-    """Writes a stream file, entry by entry; close it, or use it in a `with`.
+    """Writes a stream file, entry by entry. Close it at the end, or use it in a `with` statement.
 
         with StreamWriter("cursorLocation.dat", "cursorLocation") as writer:
             writer.append(0.25, 640, 360)
 
-    The values of an entry are those of `dtype_of(kind)`, behind the time. Entries wait in a buffer until `flush`; what
-    the disk does not take is an `OSError`.
+    An entry is its time in seconds, followed by the values of `dtype_of(kind)`. Entries wait in a buffer until `flush`.
+    If the disk does not take them, an `OSError` is raised.
 
-    Values are looked at before any of them is written: a number that its field cannot hold, a fraction or not-a-number
-    for an integer, is a `ValueError`, whatever type it comes in. Only coordinates may have fractions, which are cut
-    off, as the library does for applications. A text is a `str`, or `bytes`; anything else is a `TypeError`. An image
-    is `bytes`, or None where an earlier entry with the same `id` has it: hot spot and type are then not stored.
+    All values are checked before any of them is written. A number that its field cannot hold raises a `ValueError`,
+    whatever its type; so do a fraction or not-a-number for an integer, and a time that is not finite. Only coordinates
+    may have fractions, which are cut off, as the C++ library does. A text is a `str` or `bytes`; any other type raises a
+    `TypeError`. An image is `bytes`, or None if an earlier entry with the same `id` has it; hot spot and type are not
+    stored without an image.
     """
 
-    def __init__(self, path: _Path, kind: str) -> None:
+    def __init__(self, path: _Path, kind: Kind) -> None:
         self._fields = dtype_of(kind)
         self._coordinates = _core.coordinates_of(kind)
         self._name = f"{kind} {os.fspath(path)!r}"
@@ -151,27 +181,28 @@ class StreamWriter:
             raise TypeError(f"the values of an entry are {', '.join(names[1:])}")
         self.extend([(time, *values)])
 
-    def extend(self, entries: _Records | _Rows) -> None:
-        """Writes many entries: a sequence of tuples, an array of records whose fields have the names of
-        `dtype_of(kind)`, in any order, or rows of time and values, as an array of two dimensions or a list of lists."""
+    def extend(self, entries: _Entries) -> None:
+        """Writes many entries. They are tuples in a list, a generator or another iterable; or an array of records, whose
+        fields have the names of `dtype_of(kind)` in any order; or rows of time and values, as an array of two dimensions
+        or as lists. An iterable is read to its end before anything is written."""
         self._file.extend(_records_of(entries, self._fields, self._coordinates))
 
     def flush(self) -> None:
-        """Hands what was written to the system."""
+        """Passes the entries written so far to the operating system."""
         self._file.flush()
 
     def close(self) -> None:
-        """Ends the file. May be called more than once."""
+        """Writes what is left and closes the file. May be called more than once."""
         self._file.close()
 
     @property
     def closed(self) -> bool:
-        """Whether the file was ended."""
+        """True after `close`."""
         return self._file.closed
 
     @property
     def entries_written(self) -> int:
-        """Since the file was created, in the buffer or out of it."""
+        """The number of entries written since the file was created, those in the buffer included."""
         return self._file.entries_written
 
     def __repr__(self) -> str:
@@ -186,18 +217,19 @@ class StreamWriter:
         self.close()
 
 
-def write_stream(path: _Path, kind: str, entries: _Records | _Rows) -> None:
-    """Writes a whole stream file, of entries as `StreamWriter.extend` takes them. Where they do not fit, a file that
-    was there stays what it was."""
+def write_stream(path: _Path, kind: Kind, entries: _Entries) -> None:
+    """Writes a whole stream file, of entries in the forms that `StreamWriter.extend` accepts. If an entry does not fit,
+    an existing file stays as it was."""
     _core.write_stream(os.fspath(path), kind, _records_of(entries, dtype_of(kind), _core.coordinates_of(kind)))
 
 
 def attach(movie: _Path, streams: _Source | Iterable[_Source], *, replace: bool = False) -> Attached:
-    """Puts streams into a movie: stream files, single streams of other recordings, or all of a recording's. One of them
-    needs no list around it.
+    """Puts streams into a movie: stream files, single streams of other recordings, or all streams of a recording.
+    `streams` is one of these, or an iterable of them.
 
-    The movie holds them all afterwards, or is byte for byte what it was and `SaveError` is raised. A kind that is there
-    already is refused unless `replace` is true. What stands behind the last whole entry of a stream is left out.
+    Afterwards the movie holds all of them; otherwise a `SaveError` is raised and the movie is byte for byte what it was.
+    A kind that the movie already has is refused unless `replace` is true. Bytes after the last whole entry of a stream
+    are left out.
     """
     given = [streams] if isinstance(streams, _SOURCE_TYPES) else streams
     sources: list[str | RecordedStream] = []
@@ -210,10 +242,12 @@ def attach(movie: _Path, streams: _Source | Iterable[_Source], *, replace: bool 
 
 
 def stamp(movie: _Path, creator: str, version: str) -> Creator:
-    """Appends who made the movie, and gives what was stored: the platform's name in place of `creator`."""
+    """Appends a record of who made the movie, and returns the record as it was stored. Its name is that of the platform,
+    which takes the place of `creator`."""
     return _core.stamp(os.fspath(movie), creator, version)
 
 
 def repair(movie: _Path, *, dry_run: bool = False) -> Repair:
-    """Mends a movie's last atom, or an append that was interrupted. With `dry_run` only says what it would do."""
+    """Repairs a movie whose last atom is unfinished or to which streams were appended incompletely. With `dry_run` the
+    result says what would be done, and the movie is not changed."""
     return _core.repair(os.fspath(movie), dry_run)

@@ -1,9 +1,9 @@
-"""Makes the records that the core stores of what callers give as entries. Whatever would not be stored as it was given
-is refused before anything is converted."""
+"""Converts the entries that callers pass into the records that the core stores. A value that would not be stored as it
+was given is refused before anything is converted."""
 
 from __future__ import annotations
 
-from collections.abc import Collection, Sequence
+from collections.abc import Collection, Iterable, Mapping, Sequence, Set
 from numbers import Integral, Real
 from typing import Any, Union
 
@@ -11,17 +11,29 @@ import numpy as np
 import numpy.typing as npt
 
 Records = npt.NDArray[Any]
-Rows = Sequence[Union["tuple[Any, ...]", "list[Any]", np.void]]
+Row = Union["tuple[Any, ...]", "list[Any]", np.void]
+Entries = Union[Records, Iterable[Row]]
 Column = Union[npt.NDArray[Any], Sequence[Any]]
 
 
-def records_of(entries: Records | Rows, fields: np.dtype[Any], coordinates: Collection[str]) -> Records:
-    """An array of `fields`: `entries` itself where it is one. Fractions of `coordinates` are cut off.
+def records_of(entries: Entries, fields: np.dtype[Any], coordinates: Collection[str]) -> Records:
+    """Returns an array of `fields`, which is `entries` itself if it is one. Fractions of `coordinates` are cut off.
 
-    Throws `TypeError` for what are no entries, `ValueError` for the wrong fields and for numbers that do not fit.
+    Raises `TypeError` for something that is not entries, and `ValueError` for wrong fields, for numbers that do not fit
+    and for times that are not finite.
     """
     if isinstance(entries, np.ndarray) and entries.ndim == 1 and entries.dtype == fields:
-        return np.ascontiguousarray(entries)
+        records = np.ascontiguousarray(entries)
+    else:
+        records = _converted(entries, fields, coordinates)
+    broken = ~np.isfinite(records["time"])
+    if broken.any():
+        position = int(broken.argmax())
+        raise ValueError(f"time: {records['time'][position]} (entry {position}) is not a finite number of seconds")
+    return records
+
+
+def _converted(entries: Entries, fields: np.dtype[Any], coordinates: Collection[str]) -> Records:
     columns = _columns(entries, fields.names or ())
     records = np.empty(len(next(iter(columns.values()))), fields)
     for name, column in columns.items():
@@ -35,8 +47,8 @@ def records_of(entries: Records | Rows, fields: np.dtype[Any], coordinates: Coll
     return records
 
 
-def _columns(entries: Records | Rows, names: tuple[str, ...]) -> dict[str, Column]:
-    """The values of each field, in the order of `names`."""
+def _columns(entries: Entries, names: tuple[str, ...]) -> dict[str, Column]:
+    """Returns the values of each field, in the order of `names`."""
     if isinstance(entries, np.ndarray):
         if entries.ndim == 1 and entries.dtype.names is not None:
             _require_names(entries.dtype.names, names)
@@ -48,11 +60,11 @@ def _columns(entries: Records | Rows, names: tuple[str, ...]) -> dict[str, Colum
         if entries.ndim != 1:
             raise ValueError(f"an array of {entries.ndim} dimensions; entries are records, or rows of numbers")
         entries = entries.tolist()
-    if not isinstance(entries, Sequence) or isinstance(entries, (str, bytes, bytearray)):
-        raise TypeError(f"entries are a sequence of tuples or an array, and not {type(entries).__name__}")
-    rows: Sequence[Any] = entries
+    if not isinstance(entries, Iterable) or isinstance(entries, (str, bytes, bytearray, Mapping, Set)):
+        raise TypeError(f"entries are tuples in order, or an array, and not {type(entries).__name__}")
+    rows: Sequence[Any] = entries if isinstance(entries, (list, tuple)) else list(entries)
     if not (set(map(type, rows)) <= {tuple, list} and set(map(len, rows)) == {len(names)}):
-        rows = [_row(entry, names) for entry in entries]
+        rows = [_row(entry, names) for entry in rows]
     return dict(zip(names, zip(*rows))) if rows else {name: () for name in names}
 
 
@@ -75,7 +87,7 @@ def _require_names(given: tuple[str, ...], names: tuple[str, ...]) -> None:
 
 
 def _objects(column: Column) -> Records:
-    """One object for each value, also where these are sequences themselves. The core looks at them."""
+    """Returns one object for each value, even if the values are sequences. The core checks them."""
     values = column.tolist() if isinstance(column, np.ndarray) else column
     objects = np.empty(len(values), object)
     for position, value in enumerate(values):
@@ -84,7 +96,7 @@ def _objects(column: Column) -> Records:
 
 
 def _numbers(column: Column) -> Records:
-    """As wide as they are: Python's large integers as objects, which NumPy takes for floating-point numbers."""
+    """Returns the numbers in their full width. Large integers stay objects; NumPy would make them floating-point."""
     if isinstance(column, np.ndarray) and column.dtype.kind != "O":
         if column.ndim != 1 or column.dtype.kind not in "biuf":
             raise ValueError(f"a number is wanted, and not {column.dtype}")
@@ -116,7 +128,7 @@ def _stored(numbers: Records, kind: np.dtype[Any], is_coordinate: bool) -> Recor
 
 
 def _floats(numbers: Records, kind: np.dtype[Any]) -> Records:
-    """Rounded to what the field holds; infinite only where they were."""
+    """Returns the numbers rounded to what the field holds. A number becomes infinite only if it was."""
     with np.errstate(over="ignore"):
         stored = numbers.astype(kind)
     overflown = np.isinf(stored) & (stored != numbers)
@@ -126,6 +138,6 @@ def _floats(numbers: Records, kind: np.dtype[Any]) -> Records:
 
 
 def _extremes(numbers: Records) -> list[Any]:
-    """The smallest and the largest, or not-a-number, as Python's own numbers: these compare exactly."""
+    """Returns the smallest and the largest number, or not-a-number, as Python's own numbers, which compare exactly."""
     places = [numbers.argmin(), numbers.argmax()] if numbers.size else []
     return list(numbers[places].tolist())

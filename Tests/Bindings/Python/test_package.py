@@ -4,6 +4,7 @@ import pathlib
 import re
 import subprocess
 import sys
+import typing
 
 import numpy as np
 import zulmetadata
@@ -82,8 +83,28 @@ with zulmetadata.StreamWriter("a.dat", "cursorLocation") as writer:
     writer.extend(zulmetadata.Recording("a.dat")["cursorLocation"][::2])
 zulmetadata.attach("m.mp4", ["a.dat", pathlib.Path("b.dat"), *zulmetadata.Recording("c.mp4").streams])
 zulmetadata.attach("m.mp4", zulmetadata.Recording("c.mp4"))
+kind: zulmetadata.Kind = "cursorLocation"
+with zulmetadata.Recording("c.mp4") as recording:
+    for name, entries in recording.items():
+        zulmetadata.write_stream("b.dat", name, (tuple(entry) for entry in entries.tolist()))
+    print(recording[kind], zulmetadata.dtype_of(zulmetadata.recorded_kinds()[0]))
 print(zulmetadata.SaveError("x").file.upper(), [finding.code for finding in zulmetadata.verify("m.mp4").findings])
 """
+
+
+def test_the_type_of_a_kind_has_all_kinds():
+    assert list(typing.get_args(zulmetadata.Kind)) == zulmetadata.recorded_kinds()
+
+
+def test_the_readme_has_the_fields_of_every_kind():
+    readme = (PROJECT / "Bindings" / "Python" / "README.md").read_text()
+    rows = re.findall(r"^\| `(\w+)` \| (.*) \|$", readme, re.MULTILINE)
+    expected = []
+    for kind in zulmetadata.recorded_kinds():
+        fields = zulmetadata.dtype_of(kind)
+        expected.append((kind, ", ".join(f"`{name}` {'object' if fields[name] == object else fields[name].name}"
+                                         for name in fields.names[1:])))
+    assert rows == expected
 
 
 def test_documented_use_is_typed(tmp_path):
@@ -91,11 +112,17 @@ def test_documented_use_is_typed(tmp_path):
     consumer.write_text(CONSUMER)
     package = pathlib.Path(zulmetadata.__file__).parent.parent
     run("mypy", "--strict", str(consumer), MYPY_CACHE_DIR=str(tmp_path), MYPYPATH=str(package))
-    wrong = 'zulmetadata.write_stream("a.dat", "slideTitles", "a")\nzulmetadata.attach("m.mp4", 5)\n'
+    wrong = """
+zulmetadata.write_stream("a.dat", "slideTitles", "a")
+zulmetadata.attach("m.mp4", 5)
+zulmetadata.StreamWriter("a.dat", "slideTitle")
+zulmetadata.Recording("c.mp4")["cursorLocations"]
+"""
     consumer.write_text(CONSUMER + wrong)
     refused = subprocess.run([sys.executable, "-m", "mypy", "--strict", str(consumer)], capture_output=True, text=True,
                              env=os.environ | {"MYPY_CACHE_DIR": str(tmp_path), "MYPYPATH": str(package)})
-    assert refused.stdout.count("[arg-type]") == 2 and "Found 2 errors" in refused.stdout
+    assert refused.stdout.count("[arg-type]") == 3 and refused.stdout.count("[index]") == 1, refused.stdout
+    assert "Found 4 errors" in refused.stdout
 
 
 def heat_map(*arguments):

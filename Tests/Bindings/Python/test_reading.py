@@ -1,5 +1,7 @@
+import copy
 import gc
 import os
+import pickle
 import struct
 
 import numpy as np
@@ -30,6 +32,34 @@ def test_is_a_mapping_of_all_kinds(recording):
     assert opened.get("caretPosition") is None
     with pytest.raises(KeyError, match="caretPosition"):
         opened["caretPosition"]
+
+
+def test_a_recording_is_closed_at_the_end_of_a_with(recording):
+    with zulmetadata.Recording(recording) as opened:
+        cursor = opened["cursorLocation"]
+        assert not opened.closed
+    assert opened.closed and len(cursor) == 2 and "cursorLocation" in opened
+    with pytest.raises(ValueError, match="closed"):
+        opened["cursorLocation"]
+    opened.close()
+    with pytest.raises(RuntimeError), zulmetadata.Recording(recording) as failed:
+        raise RuntimeError
+    assert failed.closed
+
+
+def test_a_pickled_recording_is_opened_again_by_its_path(recording, monkeypatch):
+    monkeypatch.chdir(recording.parent)
+    opened = zulmetadata.Recording(recording.name)
+    pickled = pickle.dumps(opened)
+    assert len(pickled) < 1000
+    monkeypatch.chdir("/")
+    again = pickle.loads(pickled)
+    assert again.path == str(recording) and list(again) == list(opened)
+    assert again["cursorLocation"].tolist() == sample_entries("cursorLocation").tolist()
+    assert copy.copy(again)["cpuUsage"].tolist() == again["cpuUsage"].tolist()
+    recording.unlink()
+    with pytest.raises(FileNotFoundError):
+        pickle.loads(pickled)
 
 
 def test_numbers_are_decoded_as_the_bytes_say(tmp_path):

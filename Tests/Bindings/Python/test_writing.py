@@ -1,3 +1,4 @@
+import collections
 import struct
 
 import numpy as np
@@ -61,10 +62,53 @@ LOCATIONS = [(0, 1, 2), (3, 4, 5)]
     np.array([(2, 0, 1), (5, 3, 4)], [("y", "O"), ("time", "<i4"), ("x", "<f8")]),  # in another order
     np.rec.array(LOCATIONS, zulmetadata.dtype_of("cursorLocation")),
     list(np.array(LOCATIONS, zulmetadata.dtype_of("cursorLocation"))),
+    collections.deque(LOCATIONS),
 ])
 def test_entries_of_every_shape(tmp_path, entries):
     zulmetadata.write_stream(tmp_path / "a.dat", "cursorLocation", entries)
     assert zulmetadata.Recording(tmp_path / "a.dat")["cursorLocation"].tolist() == LOCATIONS
+
+
+def failing_after(entries):
+    yield from entries
+    raise RuntimeError("no more")
+
+
+def test_generators_are_taken_wherever_entries_are(tmp_path, plain_movie):
+    file = tmp_path / "a.dat"
+    zulmetadata.write_stream(file, "cursorLocation", (entry for entry in LOCATIONS))
+    assert zulmetadata.Recording(file)["cursorLocation"].tolist() == LOCATIONS
+    with zulmetadata.StreamWriter(file, "cursorLocation") as writer:
+        writer.extend(map(tuple, np.array(LOCATIONS)))
+        writer.extend(zip([6], [7], [8]))
+        writer.extend(iter(()))
+        with pytest.raises(RuntimeError, match="no more"):
+            writer.extend(failing_after(LOCATIONS))
+        assert writer.entries_written == 3
+    assert zulmetadata.Recording(file)["cursorLocation"].tolist() == [*LOCATIONS, (6, 7, 8)]
+    with pytest.raises(RuntimeError, match="no more"):
+        zulmetadata.write_stream(file, "cursorLocation", failing_after(LOCATIONS))
+    assert len(zulmetadata.Recording(file)["cursorLocation"]) == 3
+    zulmetadata.attach(plain_movie, (source for source in [file]))
+    assert list(zulmetadata.Recording(plain_movie)) == ["cursorLocation"]
+
+
+@pytest.mark.parametrize("time", [float("nan"), float("inf"), -float("inf"), np.float32("nan")])
+def test_times_that_are_not_finite_are_refused(tmp_path, time):
+    file = tmp_path / "a.dat"
+    with zulmetadata.StreamWriter(file, "cursorLocation") as writer:
+        for entries in ([(0, 1, 2), (time, 3, 4)], np.array([(0, 1, 2), (time, 3, 4)]),
+                        np.array([(0, 1, 2), (time, 3, 4)], zulmetadata.dtype_of("cursorLocation"))):
+            with pytest.raises(ValueError, match=r"time: -?(nan|inf) \(entry 1\) is not a finite number of seconds"):
+                writer.extend(entries)
+        with pytest.raises(ValueError, match="not a finite number of seconds"):
+            writer.append(time, 1, 2)
+        assert writer.entries_written == 0
+    before = file.read_bytes()
+    for kind, entry in (("slideTitles", (time, "a")), ("cursorImage", (time, 1, 0, 0, 0, 3, None))):
+        with pytest.raises(ValueError, match="not a finite number of seconds"):
+            zulmetadata.write_stream(file, kind, [entry])
+    assert file.read_bytes() == before
 
 
 @pytest.mark.parametrize("entries", [[], (), np.empty((0, 3)), np.array([])])
@@ -74,9 +118,11 @@ def test_no_entries(tmp_path, entries):
 
 
 @pytest.mark.parametrize("entries, error, sentence", [
-    (5, TypeError, "a sequence of tuples or an array, and not int"),
+    (5, TypeError, "tuples in order, or an array, and not int"),
     ("abc", TypeError, "and not str"),
     ({0: (1, 2)}, TypeError, "and not dict"),
+    ({(0, 1, 2)}, TypeError, "and not set"),
+    (iter("abc"), TypeError, "an entry is a tuple of time, x, y, and not str"),
     ([0, 1, 2], TypeError, "an entry is a tuple of time, x, y, and not int"),
     (["abc"], TypeError, "and not str"),
     (np.array([0.0, 1, 2]), TypeError, "an entry is a tuple"),
