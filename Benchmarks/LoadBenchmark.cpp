@@ -5,6 +5,7 @@
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
 #include <fmt/core.h>
+#include <functional>
 
 #include <cmath>
 #include <cstdint>

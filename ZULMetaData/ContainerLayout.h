@@ -3,11 +3,11 @@
 // The atoms of a movie or the chunks of a RIFF file as their headers declare them, for tools that show or check a
 // container. Nothing between the headers is read.
 
+#include "../SharedDependencies/Callback.h"
 #include "../SharedDependencies/Export.h"
 #include "ZULMMetaDataParser.h"
 
 #include <cstdint>
-#include <functional>
 #include <istream>
 #include <string>
 #include <vector>
@@ -41,7 +41,7 @@ struct ZULMETADATA_API ContainerItem {
 
 /// Gets one item after the other and ends the walk by false. The stream stands anywhere meanwhile and must be left
 /// there.
-using ContainerVisitor = std::function<bool(const ContainerItem&)>;
+using ContainerVisitor = Callback<bool(const ContainerItem&)>;
 
 /// The items between `begin` and `end` of `stream`, which holds `total` bytes. Ends with the first item that nothing
 /// can follow: one with an open end, one whose end no file position can hold, or one that reaches beyond the total.

@@ -3,12 +3,12 @@
 // How much of a metadata stream is whole: its header and the entries in front of the first one that is cut short.
 // Bounded by the bytes that are there, whatever sizes they declare, and in constant memory.
 
+#include "../SharedDependencies/Callback.h"
 #include "../SharedDependencies/Export.h"
 #include "ZULMMetaDataUUIDs.h"
 
 #include <cstddef>
 #include <cstdint>
-#include <functional>
 #include <istream>
 #include <optional>
 #include <span>
@@ -31,7 +31,7 @@ struct StreamExtent {
 };
 
 /// Gives how many bytes it read: fewer than asked for only where there are no more.
-using ReadBytes = std::function<std::size_t(std::uint64_t position, std::span<char> bytes)>;
+using ReadBytes = Callback<std::size_t(std::uint64_t position, std::span<char> bytes)>;
 
 /// Walks the `length` bytes of a stream. None where they do not hold a stream's header.
 ZULMETADATA_API std::optional<StreamExtent> measureStream(const ReadBytes& read, std::uint64_t length);

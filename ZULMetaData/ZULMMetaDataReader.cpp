@@ -1,5 +1,6 @@
 #include "ZULMetaData/ZULMMetaDataReader.h"
 
+#include <algorithm>
 #include <iostream>
 
 namespace ZULMetaData::detail {

@@ -14,7 +14,6 @@
 #include "ZULMMetaDataCommon.h"
 #include "ZULMMetaDataUUIDs.h"
 
-#include <algorithm>
 #include <array>
 #include <cstdint>
 #include <cstring>
@@ -80,7 +79,7 @@ std::uint64_t readFixedEntry(std::istream& stream, double& time, T& value) {
     const std::size_t size = readBytes(stream, entry.data(), entry.size());
     if (size < sizeof time)
         throwIfInputEnded(stream);
-    std::memcpy(&time, entry.data(), std::min(size, sizeof time));
+    std::memcpy(&time, entry.data(), size < sizeof time ? size : sizeof time);
     if (size > sizeof time)
         std::memcpy(&value, entry.data() + sizeof time, size - sizeof time);
     return entry.size();

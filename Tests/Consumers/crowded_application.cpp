@@ -8,14 +8,16 @@
 #include "Platform/FileLocation.h"
 #include "Platform/Image.h"
 #include "Platform/ProcessInfo.h"
+#include "SharedDependencies/Callback.h"
 #include "SharedDependencies/CreatorAttributes.h"
 #include "SharedDependencies/EndianFile.h"
 #include "SharedDependencies/Export.h"
 #include "SharedDependencies/ZCAPHeader.h"
 
 #if !defined(APPLICATION_HAS_FILE_LOCATION) || !defined(APPLICATION_HAS_IMAGE) ||                                      \
-    !defined(APPLICATION_HAS_PROCESS_INFO) || !defined(APPLICATION_HAS_CREATOR_ATTRIBUTES) ||                          \
-    !defined(APPLICATION_HAS_ENDIAN_FILE) || !defined(APPLICATION_HAS_EXPORT) || !defined(APPLICATION_HAS_ZCAPHEADER)
+    !defined(APPLICATION_HAS_PROCESS_INFO) || !defined(APPLICATION_HAS_CALLBACK) ||                                    \
+    !defined(APPLICATION_HAS_CREATOR_ATTRIBUTES) || !defined(APPLICATION_HAS_ENDIAN_FILE) ||                           \
+    !defined(APPLICATION_HAS_EXPORT) || !defined(APPLICATION_HAS_ZCAPHEADER)
 #error "the application does not get its own headers"
 #endif
 

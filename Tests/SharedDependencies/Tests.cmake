@@ -1,3 +1,4 @@
+zulm_add_test(SharedDependencies/CallbackTest)
 zulm_add_test(SharedDependencies/CreatorAttributesTest)
 zulm_add_test(SharedDependencies/EndianFileTest)
 zulm_add_test(SharedDependencies/ZCAPHeaderTest)

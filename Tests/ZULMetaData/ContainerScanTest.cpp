@@ -6,6 +6,7 @@
 #include "Tests/ZULMetaData/WatchedStream.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
+#include <algorithm>
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 

@@ -5,7 +5,6 @@
 
 #include "../../ZULMetaData/ZULMMetaDataCommon.h"
 
-#include <cmath>
 #include <concepts>
 #include <cstdint>
 #include <limits>
@@ -93,13 +92,11 @@ struct ScreenRect {
 /// Toward zero; saturates outside the 32-bit range, and not-a-number becomes 0.
 inline std::int32_t truncated(double coordinate) {
     using Limits = std::numeric_limits<std::int32_t>;
-    if (std::isnan(coordinate))
-        return 0;
-    if (coordinate <= Limits::min())
-        return Limits::min();
     if (coordinate >= Limits::max())
         return Limits::max();
-    return static_cast<std::int32_t>(coordinate);
+    if (coordinate > Limits::min())
+        return static_cast<std::int32_t>(coordinate);
+    return coordinate <= Limits::min() ? Limits::min() : 0; // all comparisons with not-a-number are false
 }
 
 /// Both coordinates, each as above.

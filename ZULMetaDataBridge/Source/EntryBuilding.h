@@ -2,12 +2,12 @@
 
 // Turns decoded values into entries, by the fields of their kind.
 
+#include "../../SharedDependencies/Export.h"
 #include "EntryDictionary.h"
 #include "MetaDataKinds.h"
 
 #include <concepts>
 #include <cstdint>
-#include <functional>
 #include <string>
 #include <tuple>
 #include <type_traits>
@@ -16,27 +16,13 @@ namespace ZULMetaData {
 
 /// A value as an entry holds it: unsigned integers keep their bits, reals are narrowed to 32 bits.
 ///@{
-inline EntryValue entryValue(std::int32_t value) {
-    return value;
-}
-inline EntryValue entryValue(std::uint32_t value) {
-    return static_cast<std::int32_t>(value);
-}
-inline EntryValue entryValue(std::uint64_t value) {
-    return static_cast<std::int64_t>(value);
-}
-inline EntryValue entryValue(float value) {
-    return value;
-}
-inline EntryValue entryValue(double value) {
-    return static_cast<float>(value);
-}
-inline EntryValue entryValue(std::string value) {
-    return value;
-}
-inline EntryValue entryValue(EntryValue value) {
-    return value;
-}
+ZULMETADATA_API EntryValue entryValue(std::int32_t value);
+ZULMETADATA_API EntryValue entryValue(std::uint32_t value);
+ZULMETADATA_API EntryValue entryValue(std::uint64_t value);
+ZULMETADATA_API EntryValue entryValue(float value);
+ZULMETADATA_API EntryValue entryValue(double value);
+ZULMETADATA_API EntryValue entryValue(std::string value);
+ZULMETADATA_API EntryValue entryValue(EntryValue value);
 ///@}
 
 /// A field whose value is a number of 32 bits, or becomes one.
@@ -71,11 +57,10 @@ EntryDictionary makeEntry(double time, const typename Kind::Value& value) {
     static_assert(std::tuple_size_v<decltype(Kind::fields)> < EntryDictionary::maxSize);
     const auto build = [&](const auto&... field) -> EntryDictionary {
         const EntryKeys& keys = entryKeys<Kind>();
-        if constexpr ((NumberField<decltype(std::invoke(field.valueOf, value))> && ...))
-            return EntryDictionary::ofNumbers(keys,
-                                              {entryNumber(std::invoke(field.valueOf, value))..., entryNumber(time)});
+        if constexpr ((NumberField<decltype(valueOfField(field, value))> && ...))
+            return EntryDictionary::ofNumbers(keys, {entryNumber(valueOfField(field, value))..., entryNumber(time)});
         else
-            return {keys, {entryValue(std::invoke(field.valueOf, value))..., entryValue(time)}};
+            return {keys, {entryValue(valueOfField(field, value))..., entryValue(time)}};
     };
     return std::apply(build, Kind::fields);
 }

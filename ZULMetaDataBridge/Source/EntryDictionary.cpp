@@ -1,7 +1,10 @@
 #include "ZULMetaDataBridge/Source/EntryDictionary.h"
 
 #include <algorithm>
+#include <memory>
 #include <stdexcept>
+#include <type_traits>
+#include <utility>
 
 namespace ZULMetaData {
 
@@ -12,6 +15,9 @@ EntryValue valueOf(const EntryNumber& number) {
 }
 
 } // namespace
+
+EntryDictionary::EntryDictionary(const EntryKeys& keys, Values values)
+    : keys_(&keys), values_(new Values(std::move(values))) {}
 
 EntryDictionary::EntryDictionary(const EntryDictionary& other) : keys_(other.keys_), numbers_(other.numbers_) {
     if (const Values* values = other.values_.load(std::memory_order_acquire))
@@ -53,6 +59,20 @@ std::size_t EntryDictionary::indexOf(std::string_view key) const {
     return static_cast<std::size_t>(found - keys_->begin());
 }
 
+template <class T>
+T EntryDictionary::valueAt(std::string_view key) const {
+    if constexpr (std::is_same_v<T, std::int32_t> || std::is_same_v<T, float>)
+        if (!values_.load(std::memory_order_acquire))
+            return std::get<T>(numbers_[indexOf(key)]);
+    return std::get<T>(at(key));
+}
+
+template std::int32_t EntryDictionary::valueAt(std::string_view key) const;
+template std::int64_t EntryDictionary::valueAt(std::string_view key) const;
+template float EntryDictionary::valueAt(std::string_view key) const;
+template std::string EntryDictionary::valueAt(std::string_view key) const;
+template std::shared_ptr<const Image> EntryDictionary::valueAt(std::string_view key) const;
+
 /// Where two threads make them at once, the first to be done has made the entry's own.
 const EntryDictionary::Values& EntryDictionary::values() const {
     const Values* values = values_.load(std::memory_order_acquire);
@@ -63,6 +83,14 @@ const EntryDictionary::Values& EntryDictionary::values() const {
     if (values_.compare_exchange_strong(values, made.get(), std::memory_order_acq_rel))
         values = made.release();
     return *values;
+}
+
+EntryDictionary::value_type EntryDictionary::pairAt(std::size_t index) const {
+    return {(*keys_)[index], values()[index]};
+}
+
+void EntryDictionary::deleteValues() noexcept {
+    delete values_.load(std::memory_order_relaxed);
 }
 
 } // namespace ZULMetaData

@@ -55,7 +55,7 @@ public:
     class const_iterator;
 
     /// `keys` must outlive the entry; `values` are its values in the same order, at most `maxSize`.
-    EntryDictionary(const EntryKeys& keys, Values values) : keys_(&keys), values_(new Values(std::move(values))) {}
+    EntryDictionary(const EntryKeys& keys, Values values);
 
     /// The same for an entry of numbers alone; allocates nothing.
     static EntryDictionary ofNumbers(const EntryKeys& keys, const Numbers& numbers) noexcept {
@@ -72,7 +72,10 @@ public:
         other.values_.store(nullptr, std::memory_order_relaxed);
     }
     EntryDictionary& operator=(EntryDictionary other) noexcept; ///< copies or moves, as `other` was made
-    ~EntryDictionary() { delete values_.load(std::memory_order_relaxed); }
+    ~EntryDictionary() {
+        if (values_.load(std::memory_order_relaxed))
+            deleteValues();
+    }
 
     /// Throws `std::out_of_range` for a key that the entry lacks. Valid as long as the entry.
     const EntryValue& at(std::string_view key) const;
@@ -90,8 +93,12 @@ public:
 private:
     explicit EntryDictionary(const EntryKeys& keys) noexcept : keys_(&keys) {}
 
+    template <class T>
+    T valueAt(std::string_view key) const;
     std::size_t indexOf(std::string_view key) const;
     const Values& values() const;
+    value_type pairAt(std::size_t index) const;
+    void deleteValues() noexcept;
 
     const EntryKeys* keys_;
     Numbers numbers_{};                                   // where there are no values
@@ -125,7 +132,7 @@ public:
 
     /// As of any input iterator. What they give refers into the entry.
     ///@{
-    reference operator*() const { return {(*entry_->keys_)[index_], entry_->values()[index_]}; }
+    reference operator*() const { return entry_->pairAt(index_); }
     pointer operator->() const { return {**this}; }
     const_iterator& operator++() {
         ++index_;
@@ -144,13 +151,16 @@ template <class T>
 T EntryDictionary::get(std::string_view key) const {
     static_assert(isEntryValueType<T>, "get<T>: an entry holds std::int32_t, std::int64_t, float, std::string and "
                                        "std::shared_ptr<const Image>; T must be one of these");
-    if constexpr (std::is_same_v<T, std::int32_t> || std::is_same_v<T, float>)
-        if (!values_.load(std::memory_order_acquire))
-            return std::get<T>(numbers_[indexOf(key)]);
-    if constexpr (isEntryValueType<T>) // else the sentence above is followed by hundreds of lines from the variant
-        return std::get<T>(at(key));
+    if constexpr (isEntryValueType<T>) // otherwise the linker would complain as well
+        return valueAt<T>(key);
     else
         throw std::bad_variant_access();
 }
+
+extern template ZULMETADATA_API std::int32_t EntryDictionary::valueAt(std::string_view key) const;
+extern template ZULMETADATA_API std::int64_t EntryDictionary::valueAt(std::string_view key) const;
+extern template ZULMETADATA_API float EntryDictionary::valueAt(std::string_view key) const;
+extern template ZULMETADATA_API std::string EntryDictionary::valueAt(std::string_view key) const;
+extern template ZULMETADATA_API std::shared_ptr<const Image> EntryDictionary::valueAt(std::string_view key) const;
 
 } // namespace ZULMetaData

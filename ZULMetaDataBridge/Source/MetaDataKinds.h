@@ -11,7 +11,6 @@
 #include "HumanReadableActions.h"
 
 #include <cstdint>
-#include <functional>
 #include <iterator>
 #include <list>
 #include <stdexcept>
@@ -30,6 +29,18 @@ struct Field {
     /// Deduces the projection's type.
     constexpr Field(const char* fieldKey, Projection projection) : key(fieldKey), valueOf(projection) {}
 };
+
+/// Returns what `field` takes from `value`: a member, or the result of a function.
+template <class Projection, class Value>
+constexpr decltype(auto) valueOfField(const Field<Projection>& field, const Value& value) {
+    if constexpr (std::is_member_object_pointer_v<Projection>)
+        return (value.*field.valueOf);
+    else
+        return field.valueOf(value);
+}
+
+/// The projection of a kind whose value is a single number.
+inline constexpr auto wholeValue = [](const auto& value) { return value; };
 
 inline constexpr std::tuple s_pointFields{Field{"x", &Point::x}, Field{"y", &Point::y}}; ///< of every kind of points
 
@@ -82,7 +93,7 @@ struct CPUUsageKind {
     using Value = float;
     static constexpr uuid type = s_cpuUsageUUID;
     static constexpr int version = 1;
-    static constexpr std::tuple fields{Field{"cpuUsage", std::identity{}}};
+    static constexpr std::tuple fields{Field{"cpuUsage", wholeValue}};
 };
 
 /// How opaque the cursor was drawn.
@@ -90,7 +101,7 @@ struct CursorOpacityKind {
     using Value = double;
     static constexpr uuid type = s_cursorOpacityUUID;
     static constexpr int version = 1;
-    static constexpr std::tuple fields{Field{"opacity", std::identity{}}};
+    static constexpr std::tuple fields{Field{"opacity", wholeValue}};
 };
 
 /// The display's scale factor.
@@ -98,7 +109,7 @@ struct ScaleFactorKind {
     using Value = std::int32_t;
     static constexpr uuid type = s_recordingScaleFactorUUID;
     static constexpr int version = 1;
-    static constexpr std::tuple fields{Field{"scaleFactor", std::identity{}}};
+    static constexpr std::tuple fields{Field{"scaleFactor", wholeValue}};
 };
 
 /// Titles of slides.
@@ -160,7 +171,7 @@ struct CursorActionKind {
     static constexpr uuid type = s_cursorActionUUID;
     static constexpr int version = 1;
     static constexpr std::tuple fields{Field{"action", HumanReadableActions::CursorActionToString},
-                                       Field{"rawActionValue", std::identity{}}};
+                                       Field{"rawActionValue", wholeValue}};
 };
 
 /// "characterString" of an entry, by `HumanReadableActions::KeyboardActionCodeToString`.

@@ -7,6 +7,7 @@
 //         std::cout << stream.name << ": " << stream.entries << " entries, " << stream.bytesCut << " bytes cut off\n";
 
 #include "../../Platform/FileLocation.h"
+#include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
 #include "../../SharedDependencies/ZCAPHeader.h"
 #include "../../ZULMetaData/RepairPlan.h"
@@ -14,7 +15,6 @@
 #include "StreamSource.h"
 
 #include <cstdint>
-#include <functional>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -84,7 +84,7 @@ public:
 
     /// Called now and then with the bytes that were written or read back. What it throws ends and undoes the
     /// operation.
-    using Progress = std::function<void(std::uint64_t done, std::uint64_t total)>;
+    using Progress = Callback<void(std::uint64_t done, std::uint64_t total)>;
 
     explicit SafeMovieSave(FileLocation movie, Progress progress = {}); ///< does not touch the movie
 

@@ -7,12 +7,12 @@
 //     std::ofstream copy("keyboardAction.dat", std::ios::binary);
 //     redactStream(StreamSource::file("private/keyboardAction.dat").open(), redaction, copy);
 
+#include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
 #include "../../ZULMetaData/ZULMMetaDataUUIDs.h"
 #include "StreamSource.h"
 
 #include <cstdint>
-#include <functional>
 #include <optional>
 #include <ostream>
 #include <set>
@@ -65,13 +65,13 @@ struct Redaction {
     bool clearsKeys = false;
 
     /// Returns whether a title, text, comment or name becomes `s_hiddenText`. Receives the stored bytes.
-    std::function<bool(const std::string&)> hidesText;
+    Callback<bool(const std::string&)> hidesText;
 
     /// Entries with a time in one of these ranges are removed, and entries whose time is not a number.
     std::vector<TimeRange> removedTimes;
 
     /// Called for every entry that is removed, changed or added, in the order of the stream. May be empty.
-    std::function<void(const RedactedEntry&)> onEntry;
+    Callback<void(const RedactedEntry&)> onEntry;
 };
 
 /// What a copy lacks.

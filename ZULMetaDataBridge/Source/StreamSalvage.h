@@ -8,13 +8,13 @@
 //     for (const SalvagedStream& stream : salvage.run().streams)
 //         std::cout << stream.header.uuid << " at " << stream.offset << ": " << stream.entries << " entries\n";
 
+#include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
 #include "../../ZULMetaData/StreamEntries.h"
 #include "../../ZULMetaData/ZULMMetaDataParser.h"
 
 #include <cstddef>
 #include <cstdint>
-#include <functional>
 #include <istream>
 #include <optional>
 #include <string_view>
@@ -62,7 +62,7 @@ struct SalvageReport {
 class ZULMETADATA_API StreamSalvage {
 public:
     /// Called now and then with how many bytes have been searched.
-    using Progress = std::function<void(std::uint64_t done)>;
+    using Progress = Callback<void(std::uint64_t done)>;
 
     /// `file` is the caller's and must outlive this. Of the type `Unknown` or `RawStream` nothing is walked, but what a
     /// bare stream file begins with is reachable. Throws `std::system_error` where the file has no size.

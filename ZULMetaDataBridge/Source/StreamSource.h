@@ -4,11 +4,11 @@
 // or in memory.
 
 #include "../../Platform/FileLocation.h"
+#include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
 #include "../../ZULMetaData/StreamExtent.h"
 
 #include <cstdint>
-#include <functional>
 #include <string>
 #include <string_view>
 
@@ -36,10 +36,10 @@ public:
     Bytes open() const { return open_(); } ///< independent of those that were opened before
 
 private:
-    StreamSource(std::string name, std::function<Bytes()> open) : name_(std::move(name)), open_(std::move(open)) {}
+    StreamSource(std::string name, Callback<Bytes()> open) : name_(std::move(name)), open_(std::move(open)) {}
 
     std::string name_;
-    std::function<Bytes()> open_;
+    Callback<Bytes()> open_;
 };
 
 } // namespace ZULMetaData

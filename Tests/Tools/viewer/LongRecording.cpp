@@ -4,6 +4,7 @@
 #include "Tools/demo/Cursors.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
+#include <algorithm>
 #include <cmath>
 #include <cstdlib>
 #include <filesystem>

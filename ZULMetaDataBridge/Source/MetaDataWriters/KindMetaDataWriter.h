@@ -10,8 +10,8 @@
 #include "BaseMetaDataWriter.h"
 #include "KeptReachable.h"
 
-#include <cmath>
 #include <cstdint>
+#include <limits>
 #include <memory>
 #include <new>
 #include <utility>
@@ -59,7 +59,7 @@ protected:
     void append(const typename Kind::Value& value, double seconds, bool flush) {
         if (metaDataWriter_)
             metaDataWriter_->write(seconds, value, flush);
-        hasOnlyFiniteTimes_ &= std::isfinite(seconds);
+        hasOnlyFiniteTimes_ &= isFinite(seconds);
         countEntry();
     }
 
@@ -76,6 +76,11 @@ protected:
     }
 
 private:
+    /// <cmath> has this too, at the price of ten thousand lines in every program.
+    static bool isFinite(double seconds) {
+        return seconds >= std::numeric_limits<double>::lowest() && seconds <= std::numeric_limits<double>::max();
+    }
+
     /// A stream writer's destructor is not virtual: for one that is of exactly this type.
     struct Destroyer {
         void operator()(StreamWriter* writer) const {

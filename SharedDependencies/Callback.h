@@ -1,0 +1,50 @@
+#pragma once
+
+// A function that one side hands over and the other side calls, such as a progress report or a source of bytes.
+
+#include <cstddef>
+#include <memory>
+#include <type_traits>
+#include <utility>
+
+namespace ZULMetaData {
+
+template <class Signature>
+class Callback;
+
+/// Holds anything that can be called with `Arguments` and returns a `Result`: a lambda, a function, a `std::function`.
+/// An empty one must not be called. Copies share what they hold.
+///
+/// It takes the place of `std::function` in public headers, because <functional> alone is as long as all of them.
+template <class Result, class... Arguments>
+class Callback<Result(Arguments...)> {
+public:
+    Callback() = default;
+    Callback(std::nullptr_t) {} ///< empty
+
+    /// Holds `function`, which is moved in. A null pointer or an empty `std::function` makes an empty callback.
+    template <class Function>
+    requires(!std::is_same_v<Function, Callback> && std::is_invocable_r_v<Result, Function&, Arguments...>)
+        Callback(Function function) {
+        if constexpr (std::is_constructible_v<bool, Function> && !std::is_empty_v<Function>)
+            if (!static_cast<bool>(function))
+                return;
+        call_ = [](void* held, Arguments... arguments) -> Result {
+            return static_cast<Result>((*static_cast<Function*>(held))(std::forward<Arguments>(arguments)...));
+        };
+        held_ = std::make_shared<Function>(std::move(function));
+    }
+
+    /// Calls what is held, and lets its exceptions through.
+    Result operator()(Arguments... arguments) const {
+        return call_(held_.get(), std::forward<Arguments>(arguments)...);
+    }
+
+    explicit operator bool() const { return call_ != nullptr; } ///< false if it is empty
+
+private:
+    Result (*call_)(void*, Arguments...) = nullptr;
+    std::shared_ptr<void> held_;
+};
+
+} // namespace ZULMetaData
