@@ -31,3 +31,12 @@ mark_as_advanced(PYTHON3)
 set(compile_with ${CMAKE_CXX_COMPILER} -std=c++20 -I${PROJECT_SOURCE_DIR})
 add_test(NAME Consumers/wrong_type COMMAND ${PYTHON3} ${CMAKE_CURRENT_LIST_DIR}/compile.py refused
   ${CMAKE_CURRENT_LIST_DIR}/wrong_type.cpp "T must be one of these" ${compile_with})
+
+# zulm_add_header_cost(HEADER SHARE): see compile.py.
+function(zulm_add_header_cost header share)
+  add_test(NAME Consumers/cost/${header} COMMAND ${PYTHON3} ${CMAKE_CURRENT_FUNCTION_LIST_DIR}/compile.py cost
+    ${header} ${share} ${compile_with})
+endfunction()
+zulm_add_header_cost(ZULMetaDataBridge/ZULMetaDataBridge.h 12)
+zulm_add_header_cost(ZULMetaData/ZULMMetaDataWriter.h -20)
+zulm_add_header_cost(ZULMetaDataBridge/ZULMetaDataForward.h -99)

@@ -37,7 +37,9 @@ struct Record {
     int number;
 };
 
-#include "installed_headers.h"
+#include "ZULMetaDataBridge/ZULMetaDataForward.h"
+
+#include "installed_headers.h" // after the declarations, which must agree with it
 
 #include <cstdio>
 #include <string>
