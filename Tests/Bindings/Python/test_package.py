@@ -30,7 +30,7 @@ def described(thing):
 def public_things():
     for name in zulmetadata.__all__:
         thing = getattr(zulmetadata, name)
-        if not isinstance(thing, str):
+        if not isinstance(thing, str) and typing.get_origin(thing) is None:  # which cannot have a text
             yield name, thing
         if isinstance(thing, type):
             yield from ((f"{name}.{member}", getattr(thing, member)) for member in vars(thing)
