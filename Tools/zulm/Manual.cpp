@@ -57,19 +57,21 @@ std::vector<std::string> linesOf(const std::string& text) {
 } // namespace
 
 const char* const s_aboutOutput =
-    "Results go to standard output, everything else to standard error. --json, on every command that reports, prints "
-    "one document: {\"schema\": \"zulm.COMMAND\", \"schema_version\": 1, \"tool_version\": ..., \"files\": [...]}; "
-    "a file that could not be read is not in it. Where a file is read, - is standard input. Files that are written "
-    "appear whole or not at all; one that is there already is replaced only with --force.";
+    "Results are printed to standard output, and everything else to standard error. With --json, a command that "
+    "reports "
+    "something prints one JSON document: {\"schema\": \"zulm.COMMAND\", \"schema_version\": 1, \"tool_version\": ..., "
+    "\"files\": [...]}. A file that could not be read is not in it. If a command reads a file, the name - stands for "
+    "standard input. Files that a command writes appear whole or not at all. An existing file is replaced only with "
+    "--force.";
 
 const std::vector<ExitCodeMeaning>& exitCodeMeanings() {
     static const std::vector<ExitCodeMeaning> meanings{
-        {"0", "all is fine"},
-        {"1", "failed: a file could not be read, or a result could not be written"},
-        {"2", "wrong usage: nothing has been done"},
-        {"3", "done, but loss or damage was found"},
-        {"4", "readable, but without recording metadata"},
-        {"128+n", "ended by signal n; unfinished files have been removed"},
+        {"0", "Everything is fine."},
+        {"1", "A file could not be read, or a result could not be written."},
+        {"2", "The command line is wrong. Nothing was done."},
+        {"3", "The command did its work, but found loss or damage."},
+        {"4", "The file can be read, but holds no recording metadata."},
+        {"128+n", "Signal n ended the command. Unfinished files were removed."},
     };
     return meanings;
 }

@@ -103,8 +103,10 @@ std::string manPage(const Manual& manual) {
     page += ".SH EXIT STATUS\n";
     for (const auto& [code, meaning] : exitCodeMeanings())
         page += fmt::format(".TP\n.B {}\n{}\n", code, roff(meaning));
-    page += ".SH ENVIRONMENT\n.TP\n.B NO_COLOR\nwhere set and not empty, nothing is coloured\n.TP\n.B TERM\nnothing is "
-            "coloured where it is dumb\n.TP\n.B TMPDIR\nwhere standard input is kept while it is read\n.SH EXAMPLES\n";
+    page +=
+        ".SH ENVIRONMENT\n.TP\n.B NO_COLOR\nIf this is set and not empty, nothing is coloured.\n.TP\n.B TERM\nIf this "
+        "is dumb, nothing is coloured.\n.TP\n.B TMPDIR\nThe folder in which standard input is kept while it is "
+        "read.\n.SH EXAMPLES\n";
     for (const std::string& example : manual.examples)
         page += fmt::format(".PP\n.EX\n{}\n.EE\n", roff(example));
     return page;
@@ -113,8 +115,9 @@ std::string manPage(const Manual& manual) {
 std::string markdownPage(const Manual& manual) {
     std::string page =
         fmt::format("# zulm\n\n{}\n{}\n{}\n", manual.description, markdownExamples(manual.examples), s_aboutOutput);
-    page += "\nThis page is made from the tool's own options: `zulm --generate markdown`. The schemas of the JSON "
-            "documents are in [schemas](schemas).\n\n## Exit codes\n\n| code | meaning |\n| --- | --- |\n";
+    page +=
+        "\nThis page is generated from the tool's options by `zulm --generate markdown`. [schemas](schemas) has the "
+        "schemas of the JSON documents.\n\n## Exit codes\n\n| code | meaning |\n| --- | --- |\n";
     for (const auto& [code, meaning] : exitCodeMeanings())
         page += fmt::format("| {} | {} |\n", code, meaning);
     page += "\n## Options of every command\n" + markdownOptions(manual.options);
