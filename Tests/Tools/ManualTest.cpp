@@ -105,7 +105,7 @@ TEST(Manual, IsAPageThatGroffReadsWithoutAWarning) {
     const ToolResult result = runProgram("groff", {"-man", "-Tutf8", "-ww", folder / "zulm.1"});
     EXPECT_EQ(result.exitCode, 0);
     EXPECT_EQ(result.errors, "");
-    EXPECT_THAT(result.output, HasSubstr("ended by signal n"));
+    EXPECT_THAT(result.output, HasSubstr("Signal n ended the command"));
 }
 
 TEST(Manual, IsTheCommittedPage) {
