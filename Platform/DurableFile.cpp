@@ -1,5 +1,7 @@
 #include "Platform/DurableFile.h"
 
+#include "Platform/Descriptor.h"
+
 #include <cerrno>
 #include <fcntl.h>
 #include <string>
@@ -18,15 +20,6 @@ namespace {
 
 std::string at(std::uint64_t position) {
     return " at offset " + std::to_string(position);
-}
-
-/// Repeats a system call that a signal interrupted.
-template <class Call>
-auto uninterrupted(Call call) {
-    auto result = call();
-    while (result < 0 && errno == EINTR)
-        result = call();
-    return result;
 }
 
 struct stat statusOf(int descriptor) {

@@ -2,6 +2,7 @@ find_package(TIFF REQUIRED)
 
 zulm_add_test(Platform/AssertionReportTest)
 zulm_add_test(Platform/FileLocationTest)
+zulm_add_test(Platform/FileSystemTest)
 
 # These run other programs: those of images ImageMagick's convert and pngcheck.
 foreach(test IN ITEMS ImageStructureTest ImageTest PNGDecodeTest ProcessInfoTest TIFFDecodeTest)

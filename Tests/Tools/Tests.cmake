@@ -34,6 +34,8 @@ zulm_add_test(Tools/NumberTest)
 target_link_libraries(Tools.NumberTest PRIVATE zulm_reports)
 zulm_add_test(Tools/OutOfMemoryTest)
 target_link_libraries(Tools.OutOfMemoryTest PRIVATE zulm_commands)
+zulm_add_tool_test(Tools/OutputFileTest)
+target_link_libraries(Tools.OutputFileTest PRIVATE zulm_commands)
 zulm_add_tool_test(Tools/SchemaTest)
 target_compile_definitions(Tools.SchemaTest PRIVATE
   ZULM_DOCS="${PROJECT_SOURCE_DIR}/Docs" ZULM_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/Data")

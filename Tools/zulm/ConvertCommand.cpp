@@ -132,7 +132,7 @@ ExitCode runConvert(const ConvertOptions& options) {
     if (options.output.empty() || options.output == "-")
         writeOutput(text);
     else
-        writeWholeFile(options.output, text, {input.path()}, options.force);
+        writeWholeFile(options.output, text, {input.name()}, options.force);
     return reader.code();
 }
 

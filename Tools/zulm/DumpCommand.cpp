@@ -131,7 +131,7 @@ private:
         const std::string name =
             fmt::format("cursor-{}-entry-{}{}", cursor.uniqueId, read_, isPNG(bytes) ? ".png" : ".tiff");
         const auto file = std::filesystem::path(options_.imageFolder) / name;
-        writeWholeFile(file.string(), std::string(bytes), {recording_.path()}, options_.force);
+        writeWholeFile(file.string(), std::string(bytes), {recording_.name()}, options_.force);
         entry["image"]["file"] = validText(file.string());
         say(fmt::format("{} written", file.string()));
     }

@@ -59,7 +59,7 @@ ExitCode runExtract(const ExtractOptions& options) {
     document["streams"] = Json::array();
     ExitCode worst = ExitFine;
     for (std::size_t i = 0; i < streams.size(); ++i) {
-        writePart(input.path(), streams[i].offset, streams[i].present, outputs[i], options.force);
+        writePart(input, streams[i].offset, streams[i].present, outputs[i], options.force);
         worst = worseOf(worst, complainAboutCut(input.name(), streams[i]));
         document["streams"].push_back(streamDocument(streams[i], outputs[i]));
         if (!options.json)

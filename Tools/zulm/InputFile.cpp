@@ -1,5 +1,6 @@
 #include "Tools/zulm/InputFile.h"
 
+#include "Platform/Descriptor.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/TemporaryFile.h"
 #include "ZULMetaData/ContainerRecognition.h"
@@ -49,19 +50,6 @@ void writeAll(int file, const char* bytes, std::size_t size) {
     }
 }
 
-/// Closes it at the end of its scope.
-class Descriptor {
-public:
-    explicit Descriptor(const std::string& path) : number_(open(path.c_str(), O_WRONLY | O_CLOEXEC)) {}
-    ~Descriptor() { close(number_); }
-    Descriptor(const Descriptor&) = delete;
-    Descriptor& operator=(const Descriptor&) = delete;
-    int number() const { return number_; }
-
-private:
-    int number_;
-};
-
 } // namespace
 
 InputFile::InputFile(const std::string& argument) : name_(argument), path_(argument) {
@@ -87,7 +75,7 @@ void InputFile::spool() {
     const std::string folder = std::filesystem::temp_directory_path().string();
     temporary_ = std::make_unique<TemporaryFile>(folder, "zulm", std::string(extension));
     path_ = temporary_->path();
-    const Descriptor file(path_);
+    const ZULMetaData::Descriptor file(open(path_.c_str(), O_WRONLY | O_CLOEXEC));
     for (; size > 0; size = readInput(piece.data(), piece.size()))
         writeAll(file.number(), piece.data(), size);
     say(fmt::format("{}: standard input is kept in {} meanwhile", name_, path_));

@@ -1,29 +1,39 @@
 #include "Tools/zulm/OutputFile.h"
 
+#include "Platform/Descriptor.h"
+#include "Platform/FileSystem.h"
 #include "SharedDependencies/EndianFile.h"
 #include "Tools/zulm/Command.h"
+#include "Tools/zulm/FileAccess.h"
+#include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/Progress.h"
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/TemporaryFile.h"
 
 #include <fmt/core.h>
 
-#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <fcntl.h>
 #include <filesystem>
 #include <system_error>
 #include <unistd.h>
-#include <utility>
 
 namespace Zulm {
 
+using ZULMetaData::CopyError;
+using ZULMetaData::copyFileRange;
 using ZULMetaData::fileOpen;
+using ZULMetaData::renameWithoutReplacing;
+using ZULMetaData::Descriptor;
+using ZULMetaData::uninterrupted;
 
 namespace {
 
 namespace fs = std::filesystem;
+
+std::string existsText(const std::string& path) {
+    return fmt::format("{}: exists already; --force replaces it", path);
+}
 
 std::string failureText(const std::string& path, const char* what) {
     return fmt::format("{}: {}: {}", path, what, std::strerror(errno));
@@ -39,36 +49,24 @@ std::unique_ptr<TemporaryFile> newTemporary(const fs::path& path) {
     }
 }
 
-/// Repeats a system call that a signal interrupted.
-template <class Call>
-int uninterrupted(Call call) {
-    int result = call();
-    while (result < 0 && errno == EINTR)
-        result = call();
-    return result;
-}
-
 void sync(const std::string& path) {
-    const int file = uninterrupted([&] { return open(path.c_str(), O_RDONLY | O_CLOEXEC); });
-    const bool synced = file >= 0 && uninterrupted([file] { return fsync(file); }) == 0;
-    const int reason = errno;
-    if (file >= 0)
-        close(file);
-    errno = reason;
-    if (!synced)
+    const Descriptor file(uninterrupted([&] { return open(path.c_str(), O_RDONLY | O_CLOEXEC); }));
+    if (!file.isOpen() || uninterrupted([&] { return fsync(file.number()); }) != 0)
         throw Failure(failureText(path, "cannot be synced"));
 }
 
 } // namespace
 
-OutputFile::OutputFile(const std::string& path, const std::vector<std::string>& inputs, bool force) : path_(path) {
+OutputFile::OutputFile(const std::string& path, const std::vector<std::string>& inputs, bool force)
+    : path_(path), force_(force) {
     for (const std::string& input : inputs)
-        if (isSameFile(path, input))
+        if (isInput(path, input))
             throw Failure(fmt::format("{}: is the input {} itself; choose another output", path, input));
     if (fs::exists(path) && !fs::is_regular_file(path))
-        throw Failure(fmt::format("{}: not a regular file; choose another output", path));
+        throw Failure(fmt::format("{}: is not a regular file; choose another output", path));
     if (fs::exists(path) && !force)
-        throw Failure(fmt::format("{}: exists already; --force replaces it", path));
+        throw Failure(existsText(path));
+    access_ = std::make_unique<FileAccess>(path, inputs);
     temporary_ = newTemporary(path);
 }
 
@@ -83,31 +81,34 @@ void OutputFile::copyFrom(const std::string& source) {
 }
 
 void OutputFile::copyFrom(const std::string& source, std::uint64_t offset, std::uint64_t size) {
-    std::ifstream from = openInput(source);
-    std::ofstream to = openOutput(temporaryPath(), path_);
     Progress progress("copying " + source, size);
-    std::vector<char> piece(s_copyPieceSize);
-    from.seekg(static_cast<std::streamoff>(offset));
-    for (std::uint64_t left = size; left > 0 && to; progress.moveTo(size - left)) {
-        from.read(piece.data(), static_cast<std::streamsize>(std::min<std::uint64_t>(left, piece.size())));
-        requireRead(from, source);
-        if (from.gcount() == 0)
-            throw Failure(fmt::format("{}: ends at offset {}", source, offset + size - left));
-        to.write(piece.data(), from.gcount());
-        left -= static_cast<std::uint64_t>(from.gcount());
+    try {
+        copyFileRange(source, offset, size, temporaryPath(), [&](std::uint64_t done) { progress.moveTo(done); });
+    } catch (const CopyError& error) {
+        throw Failure(fmt::format("{}: {}", error.side() == CopyError::Side::Source ? source : path_, error.what()));
     }
-    to.close();
-    if (!to)
-        throw Failure(failureText(path_, "cannot be written"));
 }
 
 void OutputFile::commit() {
+    access_->applyTo(temporaryPath());
     sync(temporaryPath());
-    if (std::rename(temporaryPath().c_str(), path_.c_str()) != 0)
-        throw Failure(failureText(path_, "cannot be put in place"));
+    putInPlace();
     temporary_->release();
     const fs::path folder = fs::path(path_).parent_path();
     sync(folder.empty() ? "." : folder.string());
+}
+
+void OutputFile::putInPlace() {
+    try {
+        if (force_)
+            fs::rename(temporaryPath(), path_);
+        else
+            renameWithoutReplacing(temporaryPath(), path_);
+    } catch (const std::system_error& error) {
+        if (error.code() == std::errc::file_exists)
+            throw Failure(existsText(path_));
+        throw Failure(fmt::format("{}: cannot be put in place: {}", path_, error.code().message()));
+    }
 }
 
 void writeWholeFile(const std::string& path, const std::string& contents, const std::vector<std::string>& inputs,
@@ -121,10 +122,10 @@ void writeWholeFile(const std::string& path, const std::string& contents, const 
     file.commit();
 }
 
-void writePart(const std::string& input, std::uint64_t offset, std::uint64_t size, const std::string& output,
+void writePart(const InputFile& input, std::uint64_t offset, std::uint64_t size, const std::string& output,
                bool force) {
-    OutputFile file(output, {input}, force);
-    file.copyFrom(input, offset, size);
+    OutputFile file(output, {input.name()}, force);
+    file.copyFrom(input.path(), offset, size);
     file.commit();
 }
 
@@ -142,11 +143,6 @@ std::ofstream openOutput(const std::string& path, const std::string& name) {
     if (!file.is_open())
         throw Failure(fmt::format("{}: cannot be written: {}", name, std::strerror(errno)));
     return file;
-}
-
-bool isSameFile(const std::string& left, const std::string& right) {
-    std::error_code ignored;
-    return fs::equivalent(left, right, ignored);
 }
 
 } // namespace Zulm

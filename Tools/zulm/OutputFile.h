@@ -11,34 +11,45 @@
 
 namespace Zulm {
 
+class FileAccess;
+class InputFile;
 class TemporaryFile;
 
 constexpr std::size_t s_copyPieceSize = 1 << 20; ///< in bytes: what is copied at once
 
-/// Written beside its place under another name, then synced and renamed. What is not committed is removed, also when
-/// a signal ends the program.
+/// A file that is written under another name beside its place, then synced and renamed. A file that is not committed
+/// is removed, also when a signal ends the program.
+///
+/// Only its owner may read it before it is committed. Then a new file gets the permissions that the process gives to
+/// new files, but none that one of the inputs lacks. A file that replaces another one keeps the permissions of that
+/// one, but nobody may read it who may not read all inputs.
 class OutputFile {
 public:
-    /// Throws `Failure` where `path` is one of `inputs` (whatever its name), or exists and `force` is not given.
+    /// `inputs` are the files that the contents come from, as they were named on the command line ("-" is standard
+    /// input). Throws `Failure` if `path` is one of them, or exists and `force` is not given.
     OutputFile(const std::string& path, const std::vector<std::string>& inputs, bool force);
     ~OutputFile();
     OutputFile(const OutputFile&) = delete;
     OutputFile& operator=(const OutputFile&) = delete;
 
-    /// Where to write: an empty file in the same folder and with the same extension, which tells containers apart.
+    /// The path to write to: an empty file in the same folder and with the same extension.
     const std::string& temporaryPath() const;
 
-    /// Fills the file with the bytes of `source`, showing progress. Throws `Failure`.
+    /// Fills the file with the bytes of `source` and shows progress. Holes stay holes. Throws `Failure`.
     void copyFrom(const std::string& source);
 
-    /// Only with `size` bytes from `offset` on. Throws `Failure` also where `source` ends before them.
+    /// Fills it with `size` bytes from `offset` on. Throws `Failure`, also if `source` ends before them.
     void copyFrom(const std::string& source, std::uint64_t offset, std::uint64_t size);
 
-    /// Throws `Failure` where the file cannot be synced or renamed.
+    /// Throws `Failure` if the file cannot be synced or renamed, or if without `force` another file has taken its name.
     void commit();
 
 private:
+    void putInPlace();
+
     std::string path_;
+    bool force_;
+    std::unique_ptr<FileAccess> access_;
     std::unique_ptr<TemporaryFile> temporary_;
 };
 
@@ -47,16 +58,12 @@ void writeWholeFile(const std::string& path, const std::string& contents, const 
                     bool force);
 
 /// Writes a part of `input` as a whole file. Throws `Failure`.
-void writePart(const std::string& input, std::uint64_t offset, std::uint64_t size, const std::string& output,
-               bool force);
+void writePart(const InputFile& input, std::uint64_t offset, std::uint64_t size, const std::string& output, bool force);
 
 /// Throws `Failure`.
 std::ifstream openInput(const std::string& path);
 
 /// Empties a file to write into it. Throws `Failure`, which calls it `name`.
 std::ofstream openOutput(const std::string& path, const std::string& name);
-
-/// Whether both paths are the same file.
-bool isSameFile(const std::string& left, const std::string& right);
 
 } // namespace Zulm

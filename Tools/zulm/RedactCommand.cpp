@@ -167,7 +167,7 @@ ExitCode runRedact(const RedactOptions& options) {
     if (heldStreams(recording).empty())
         return complainAboutNothing(recording, {});
     const Redaction redaction = redactionFor(options);
-    OutputFile output(options.output, {input.path()}, options.force);
+    OutputFile output(options.output, {input.name()}, options.force);
     RedactedCopy copy(recording, redaction);
     copy.write(output.temporaryPath(), options.output);
     const bool isEmptyStream = recording.parser().getStreamType() == MetaDataParser::RawStream &&

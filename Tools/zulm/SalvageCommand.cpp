@@ -94,7 +94,7 @@ ExitCode runSalvage(const SalvageOptions& options) {
     ExitCode worst = report.hasMore ? ExitDamaged : ExitFine;
     for (std::size_t i = 0; i < outputs.size(); ++i) {
         const SalvagedStream& stream = report.streams[i];
-        writePart(input.path(), stream.offset, stream.bytes, outputs[i], options.force);
+        writePart(input, stream.offset, stream.bytes, outputs[i], options.force);
         worst = worseOf(worst, isWhole(stream) ? ExitFine : ExitDamaged);
         document["streams"].push_back(streamDocument(stream, outputs[i]));
         if (!options.json)

@@ -1,5 +1,6 @@
 #include "Tools/zulm/SavedMovie.h"
 
+#include "Tools/zulm/EndingSignals.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/StandardStreams.h"
@@ -8,7 +9,6 @@
 
 #include <fmt/core.h>
 
-#include <array>
 #include <csignal>
 
 namespace Zulm {
@@ -18,8 +18,6 @@ using Json = nlohmann::ordered_json;
 
 namespace {
 
-constexpr std::array s_endingSignals{SIGINT, SIGTERM, SIGHUP};
-
 volatile std::sig_atomic_t s_caught = 0;
 
 extern "C" void noteSignal(int signal) {
@@ -28,15 +26,11 @@ extern "C" void noteSignal(int signal) {
 
 void catchSignals() {
     s_caught = 0;
-    for (const int signal : s_endingSignals)
-        if (std::signal(signal, noteSignal) == SIG_IGN)
-            std::signal(signal, SIG_IGN);
+    handleEndingSignals(noteSignal);
 }
 
 void releaseSignals() {
-    for (const int signal : s_endingSignals)
-        if (std::signal(signal, SIG_DFL) == SIG_IGN)
-            std::signal(signal, SIG_IGN);
+    handleEndingSignals(SIG_DFL);
 }
 
 std::string hexText(const std::string& bytes) {

@@ -1,5 +1,7 @@
 #include "Tools/zulm/TemporaryFile.h"
 
+#include "Tools/zulm/EndingSignals.h"
+
 #include <fmt/core.h>
 
 #include <algorithm>
@@ -9,7 +11,6 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
-#include <sys/stat.h>
 #include <system_error>
 #include <unistd.h>
 
@@ -31,10 +32,11 @@ extern "C" void removeTemporariesAndEnd(int signal) {
     std::raise(signal);
 }
 
-void watchSignals() {
-    for (const int signal : {SIGINT, SIGTERM, SIGHUP, SIGPIPE})
-        if (std::signal(signal, removeTemporariesAndEnd) == SIG_IGN)
-            std::signal(signal, SIG_IGN);
+/// The pattern that `mkstemps` fills in, with a short name instead of one that would be too long for a file system.
+std::string namePattern(const std::string& name, const std::string& suffix) {
+    constexpr std::size_t longestName = 255; // in bytes
+    const std::string pattern = fmt::format(".{}.XXXXXX{}", name, suffix);
+    return pattern.size() <= longestName ? pattern : fmt::format(".zulm.XXXXXX{}", suffix);
 }
 
 void remember(const std::string& path) {
@@ -44,7 +46,7 @@ void remember(const std::string& path) {
         return;
     std::memcpy(slot->path.data(), path.c_str(), path.size() + 1);
     slot->isUsed = 1;
-    watchSignals();
+    handleEndingSignals(removeTemporariesAndEnd);
 }
 
 void forget(const std::string& path) {
@@ -55,14 +57,13 @@ void forget(const std::string& path) {
 
 } // namespace
 
-TemporaryFile::TemporaryFile(const std::string& folder, const std::string& name, const std::string& extension)
-    : path_((std::filesystem::path(folder) / fmt::format(".{}.XXXXXX{}", name, extension)).string()) {
-    const int file = mkstemps(path_.data(), static_cast<int>(extension.size()));
+TemporaryFile::TemporaryFile(const std::string& folder, const std::string& name, const std::string& extension) {
+    constexpr std::size_t longestExtension = 16; // no container has a longer one
+    const std::string suffix = extension.size() <= longestExtension ? extension : "";
+    path_ = (std::filesystem::path(folder) / namePattern(name, suffix)).string();
+    const int file = mkstemps(path_.data(), static_cast<int>(suffix.size()));
     if (file < 0)
         throw std::system_error(errno, std::generic_category(), path_);
-    const mode_t mask = umask(0);
-    umask(mask);
-    fchmod(file, 0666 & ~mask);
     close(file);
     remember(path_);
 }

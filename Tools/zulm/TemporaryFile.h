@@ -8,7 +8,7 @@ namespace Zulm {
 
 class TemporaryFile {
 public:
-    /// An empty file `.NAME.xxxxxx.EXTENSION` in `folder`, readable as any new file would be; `extension` begins with
+    /// Creates an empty file `.NAME.xxxxxx.EXTENSION` in `folder` that only its owner may read. `extension` begins with
     /// its dot. Throws `std::system_error`.
     TemporaryFile(const std::string& folder, const std::string& name, const std::string& extension);
     ~TemporaryFile();
@@ -17,7 +17,7 @@ public:
 
     const std::string& path() const { return path_; }
 
-    /// It has been renamed: there is nothing to remove any more.
+    /// Call this after the file was renamed: nothing is left to remove.
     void release();
 
 private:

@@ -129,7 +129,7 @@ ExitCode runView(const ViewOptions& options) {
     if (recording.parser().getAvailableMetaDataUUIDs().empty())
         return complainAboutNothing(recording, {});
     const PageParts page(options);
-    OutputFile file(options.output, {input.path(), options.page}, options.force);
+    OutputFile file(options.output, {input.name(), options.page}, options.force);
     writePage(file, options, input, page, viewDocument(recording, movieFor(options, input, recording)));
     if (!recording.validation().isDamaged())
         return ExitFine;

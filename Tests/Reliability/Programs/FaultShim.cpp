@@ -335,6 +335,10 @@ CHANGE_NAMES(rename)
 CHANGE_NAMES(link)
 CHANGE_NAMES(symlink)
 
+int renameat2(int fromFolder, const char* from, int toFolder, const char* to, unsigned flags) noexcept {
+    return attempt(Operation::Change, -1, [=] { return NEXT(renameat2)(fromFolder, from, toFolder, to, flags); });
+}
+
 #define REMOVE(function)                                                                                               \
     int function(const char* path) noexcept {                                                                          \
         return attempt(Operation::Change, -1, [=] { return NEXT(function)(path); });                                   \

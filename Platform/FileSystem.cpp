@@ -1,0 +1,190 @@
+#include "Platform/FileSystem.h"
+
+#include "Platform/Descriptor.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+#include <fcntl.h>
+#include <limits>
+#include <string>
+#include <system_error>
+#include <vector>
+
+namespace ZULMetaData {
+
+namespace {
+
+using Side = CopyError::Side;
+
+constexpr std::uint64_t s_bufferSize = 1 << 20;  // in bytes
+constexpr std::uint64_t s_systemCopy = 64 << 20; // in bytes: what the system copies between two reports of progress
+
+std::string at(std::uint64_t position) {
+    return " at offset " + std::to_string(position);
+}
+
+[[noreturn]] void fail(Side side, int error, const std::string& what) {
+    throw CopyError(side, what + ": " + std::strerror(error));
+}
+
+/// One copy of a range. The target begins where the range does.
+class RangeCopy {
+public:
+    RangeCopy(const FileLocation& source, std::uint64_t offset, std::uint64_t size, const FileLocation& target,
+              const CopyProgress& progress)
+        : source_(uninterrupted([&] { return open(source.c_str(), O_RDONLY | O_CLOEXEC); })),
+          target_(uninterrupted([&] { return open(target.c_str(), O_WRONLY | O_CLOEXEC); })), offset_(offset),
+          end_(offset + size), progress_(progress) {
+        if (!source_.isOpen())
+            fail(Side::Source, errno, "cannot be opened");
+        if (!target_.isOpen())
+            fail(Side::Target, errno, "cannot be opened");
+    }
+
+    void run() {
+        setTargetSize(0);
+        for (std::uint64_t position = offset_; position < end_;) {
+            const std::uint64_t begin = nextData(position);
+            const std::uint64_t end = nextHole(begin);
+            copyData(begin, end);
+            position = end;
+        }
+        setTargetSize(end_ - offset_);
+        report(end_);
+    }
+
+private:
+    /// Where stored bytes begin, at `position` or after it.
+    std::uint64_t nextData(std::uint64_t position) const {
+        const off_t data = lseek(source_.number(), static_cast<off_t>(position), SEEK_DATA);
+        if (data >= 0)
+            return std::min(static_cast<std::uint64_t>(data), end_);
+        return errno == ENXIO && sourceSize() >= end_ ? end_ : position; // else the read reports what is wrong
+    }
+
+    /// Where they end. A file system that knows no holes has one at the end of the file.
+    std::uint64_t nextHole(std::uint64_t position) const {
+        const off_t hole = lseek(source_.number(), static_cast<off_t>(position), SEEK_HOLE);
+        const bool isFound = hole >= 0 && static_cast<std::uint64_t>(hole) > position;
+        return isFound ? std::min(static_cast<std::uint64_t>(hole), end_) : end_;
+    }
+
+    std::uint64_t sourceSize() const {
+        const off_t size = lseek(source_.number(), 0, SEEK_END);
+        return size < 0 ? 0 : static_cast<std::uint64_t>(size);
+    }
+
+    void copyData(std::uint64_t begin, std::uint64_t end) {
+        for (std::uint64_t position = begin; position < end; report(position)) {
+            const std::uint64_t copied = copyBySystem(position, end - position);
+            position += copied > 0 ? copied : copyByHand(position, end - position);
+        }
+    }
+
+    /// Returns 0 if the system cannot copy between these files, or failed: reading and writing by hand tells which
+    /// side failed.
+    std::uint64_t copyBySystem([[maybe_unused]] std::uint64_t position, [[maybe_unused]] std::uint64_t size) {
+#ifdef __linux__
+        if (systemCopies_) {
+            auto from = static_cast<off_t>(position);
+            auto to = static_cast<off_t>(position - offset_);
+            const std::size_t wanted = std::min(size, s_systemCopy);
+            const ssize_t copied = uninterrupted(
+                [&] { return copy_file_range(source_.number(), &from, target_.number(), &to, wanted, 0); });
+            if (copied > 0)
+                return static_cast<std::uint64_t>(copied);
+            systemCopies_ = false;
+        }
+#endif
+        return 0;
+    }
+
+    std::uint64_t copyByHand(std::uint64_t position, std::uint64_t size) {
+        buffer_.resize(s_bufferSize);
+        const std::size_t wanted = std::min<std::uint64_t>(size, buffer_.size());
+        const ssize_t got = uninterrupted(
+            [&] { return pread(source_.number(), buffer_.data(), wanted, static_cast<off_t>(position)); });
+        if (got < 0)
+            fail(Side::Source, errno, "cannot be read" + at(position));
+        if (got == 0)
+            throw CopyError(Side::Source, "ends" + at(position));
+        write(position - offset_, static_cast<std::size_t>(got));
+        return static_cast<std::uint64_t>(got);
+    }
+
+    void write(std::uint64_t position, std::size_t size) {
+        for (std::size_t done = 0; done < size;) {
+            const ssize_t put = uninterrupted([&] {
+                return pwrite(target_.number(), buffer_.data() + done, size - done,
+                              static_cast<off_t>(position + done));
+            });
+            if (put <= 0)
+                fail(Side::Target, put < 0 ? errno : EIO, "cannot be written" + at(position + done));
+            done += static_cast<std::size_t>(put);
+        }
+    }
+
+    void setTargetSize(std::uint64_t size) {
+        if (uninterrupted([&] { return ftruncate(target_.number(), static_cast<off_t>(size)); }) != 0)
+            fail(Side::Target, errno, "cannot be given a length of " + std::to_string(size) + " bytes");
+    }
+
+    void report(std::uint64_t position) const {
+        if (progress_)
+            progress_(position - offset_);
+    }
+
+    Descriptor source_;
+    Descriptor target_;
+    std::uint64_t offset_;
+    std::uint64_t end_;
+    const CopyProgress& progress_;
+    bool systemCopies_ = true;
+    std::vector<char> buffer_;
+};
+
+/// One step that takes the name and fails if it is taken; -1 with `errno` otherwise, as a system call.
+int renameIntoFreeName(const FileLocation& from, const FileLocation& to) {
+#if defined(__linux__)
+    return renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE);
+#elif defined(__APPLE__)
+    return renamex_np(from.c_str(), to.c_str(), RENAME_EXCL);
+#else
+    errno = ENOSYS;
+    return -1;
+#endif
+}
+
+[[noreturn]] void failToRename(int error) {
+    throw std::system_error(error, std::generic_category(), "cannot be put in place");
+}
+
+} // namespace
+
+void copyFileRange(const FileLocation& source, std::uint64_t offset, std::uint64_t size, const FileLocation& target,
+                   const CopyProgress& progress) {
+    RangeCopy(source, offset, size, target, progress).run();
+}
+
+void renameWithoutReplacing(const FileLocation& from, const FileLocation& to) {
+    if (renameIntoFreeName(from, to) == 0)
+        return;
+    if (errno != EINVAL && errno != ENOSYS && errno != ENOTSUP)
+        failToRename(errno);
+    renameOverPlaceholder(from, to);
+}
+
+void renameOverPlaceholder(const FileLocation& from, const FileLocation& to) {
+    const Descriptor placeholder(
+        uninterrupted([&] { return open(to.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600); }));
+    if (!placeholder.isOpen())
+        failToRename(errno);
+    if (std::rename(from.c_str(), to.c_str()) == 0)
+        return;
+    const int reason = errno;
+    unlink(to.c_str());
+    failToRename(reason);
+}
+
+} // namespace ZULMetaData

@@ -1,0 +1,31 @@
+#pragma once
+
+// Who may read an output: nobody who may not read all of its inputs.
+
+#include <string>
+#include <sys/stat.h>
+#include <vector>
+
+namespace Zulm {
+
+class FileAccess {
+public:
+    /// The output `path` may exist, and is replaced then. Inputs are named as on the command line.
+    FileAccess(const std::string& path, const std::vector<std::string>& inputs);
+
+    /// Gives `file` the permissions of the output, as far as its file system and the process can. Whatever fails leaves
+    /// fewer permissions, never more.
+    void applyTo(const std::string& file) const;
+
+private:
+    mode_t allowedBy(const struct stat& input, gid_t group) const;
+
+    bool replaces_ = false;
+    struct stat replaced_ {};
+    std::vector<struct stat> inputs_; ///< of files, not of pipes
+};
+
+/// Whether the input is the file at `path`, whatever both are called. The input "-" is standard input.
+bool isInput(const std::string& path, const std::string& input);
+
+} // namespace Zulm
