@@ -71,7 +71,7 @@ TEST_F(OutputFileTest, GivesNobodyMoreThanTheInputDoes) {
         {{"redact", secret, "--keys", "-o", out}, out},
         {{"attach", secret, stream, "-o", folder / "a.mp4"}, folder / "a.mp4"},
         {{"repair", secret, "-o", folder / "r.mp4"}, folder / "r.mp4"},
-        {{"stamp", secret, "--name", "n", "--version", "1", "-o", folder / "s.mp4"}, folder / "s.mp4"},
+        {{"stamp", secret, "--creator", "n", "--creator-version", "1", "-o", folder / "s.mp4"}, folder / "s.mp4"},
         {{"extract", secret, "-o", folder / "streams"}, folder / "streams/cursorLocation.dat"},
         {{"salvage", secret, "-o", folder / "rescued"}, folder / "rescued/cursorLocation.dat"},
         {{"view", secret, "--page", page, "-o", folder / "v.html"}, folder / "v.html"},

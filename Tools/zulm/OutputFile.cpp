@@ -63,7 +63,7 @@ OutputFile::OutputFile(const std::string& path, const std::vector<std::string>& 
         if (isInput(path, input))
             throw Failure(fmt::format("{}: is the input {} itself; choose another output", path, input));
     if (fs::exists(path) && !fs::is_regular_file(path))
-        throw Failure(fmt::format("{}: is not a regular file; choose another output", path));
+        throw Failure(fmt::format("{}: not a regular file; choose another output", path));
     if (fs::exists(path) && !force)
         throw Failure(existsText(path));
     access_ = std::make_unique<FileAccess>(path, inputs);
