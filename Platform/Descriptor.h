@@ -1,8 +1,11 @@
 #pragma once
 
-// A file descriptor that is closed when its scope ends, and system calls that signals do not cut short.
+// What the code around system calls shares: a file descriptor that is closed when its scope ends, calls that signals do
+// not cut short, and words for messages.
 
 #include <cerrno>
+#include <cstdint>
+#include <string>
 #include <unistd.h>
 
 namespace ZULMetaData {
@@ -14,6 +17,11 @@ auto uninterrupted(Call call) {
     while (result < 0 && errno == EINTR)
         result = call();
     return result;
+}
+
+/// The end of a message about a place in a file.
+inline std::string atOffset(std::uint64_t position) {
+    return " at offset " + std::to_string(position);
 }
 
 class Descriptor {

@@ -18,10 +18,6 @@ namespace {
     throw std::system_error(error, std::generic_category(), what);
 }
 
-std::string at(std::uint64_t position) {
-    return " at offset " + std::to_string(position);
-}
-
 struct stat statusOf(int descriptor) {
     struct stat status {};
     if (fstat(descriptor, &status) != 0)
@@ -82,7 +78,7 @@ std::size_t DurableFile::readAt(std::uint64_t position, std::span<char> bytes) c
         const ssize_t got =
             uninterrupted([&] { return pread(descriptor_, bytes.data() + done, bytes.size() - done, offset); });
         if (got < 0)
-            fail(errno, "cannot be read" + at(position + done));
+            fail(errno, "cannot be read" + atOffset(position + done));
         if (got == 0)
             break;
         done += static_cast<std::size_t>(got);
@@ -97,7 +93,7 @@ void DurableFile::writeAt(std::uint64_t position, std::span<const char> bytes) {
         const ssize_t written =
             uninterrupted([&] { return pwrite(descriptor_, bytes.data() + done, bytes.size() - done, offset); });
         if (written <= 0)
-            fail(written < 0 ? errno : EIO, "cannot be written" + at(position + done));
+            fail(written < 0 ? errno : EIO, "cannot be written" + atOffset(position + done));
         done += static_cast<std::size_t>(written);
     }
 }

@@ -20,10 +20,6 @@ using Side = CopyError::Side;
 constexpr std::uint64_t s_bufferSize = 1 << 20;  // in bytes
 constexpr std::uint64_t s_systemCopy = 64 << 20; // in bytes: what the system copies between two reports of progress
 
-std::string at(std::uint64_t position) {
-    return " at offset " + std::to_string(position);
-}
-
 [[noreturn]] void fail(Side side, int error, const std::string& what) {
     throw CopyError(side, what + ": " + std::strerror(error));
 }
@@ -106,9 +102,9 @@ private:
         const ssize_t got = uninterrupted(
             [&] { return pread(source_.number(), buffer_.data(), wanted, static_cast<off_t>(position)); });
         if (got < 0)
-            fail(Side::Source, errno, "cannot be read" + at(position));
+            fail(Side::Source, errno, "cannot be read" + atOffset(position));
         if (got == 0)
-            throw CopyError(Side::Source, "ends" + at(position));
+            throw CopyError(Side::Source, "ends" + atOffset(position));
         write(position - offset_, static_cast<std::size_t>(got));
         return static_cast<std::uint64_t>(got);
     }
@@ -120,7 +116,7 @@ private:
                               static_cast<off_t>(position + done));
             });
             if (put <= 0)
-                fail(Side::Target, put < 0 ? errno : EIO, "cannot be written" + at(position + done));
+                fail(Side::Target, put < 0 ? errno : EIO, "cannot be written" + atOffset(position + done));
             done += static_cast<std::size_t>(put);
         }
     }
