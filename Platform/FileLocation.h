@@ -1,16 +1,16 @@
 #pragma once
 
-// Where a file lies. An application hands over a location; the stream core wants the bytes of its path.
+// The location of a file. Applications pass a location; the stream core uses the bytes of its path.
 
 #include <filesystem>
 #include <string>
 
 namespace ZULMetaData {
 
-using FileLocation = std::filesystem::path; ///< absolute, or relative to the working directory
+using FileLocation = std::filesystem::path; ///< an absolute path, or one relative to the working directory
 
-/// The file-system path as UTF-8. POSIX paths are handed on byte for byte, also where they are not valid UTF-8,
-/// so that every file that exists can be opened.
+/// Returns the path as UTF-8. A POSIX path is returned byte for byte even if it is not valid UTF-8, so every existing
+/// file can be opened.
 inline std::string utf8Path(const FileLocation& location) {
     return location.native();
 }

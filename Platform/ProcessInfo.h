@@ -1,6 +1,6 @@
 #pragma once
 
-// The machine and the operating system that this process runs on.
+// The machine and the operating system on which this process runs.
 
 #include "../SharedDependencies/Export.h"
 
@@ -9,22 +9,22 @@
 
 namespace ZULMetaData {
 
-/// What a recording tells of its machine.
+/// The facts about the machine that a recording stores.
 struct ZULMETADATA_API ProcessInfo {
-    /// Processors that the machine has; never 0.
+    /// The number of processors of the machine; at least 1.
     std::uint64_t processorCount = 1;
-    /// Processors that are switched on; at least 1, at most processorCount.
+    /// The number of processors that are switched on; from 1 to `processorCount`.
     std::uint64_t activeProcessorCount = 1;
-    /// In bytes; 0 where the system does not tell.
+    /// The size of the memory in bytes; 0 if the system does not say.
     std::uint64_t physicalMemory = 0;
-    /// For people: "Version 14.2 (Build 23C64)" on a Mac, the name of the distribution on Linux.
+    /// A text for people: "Version 14.2 (Build 23C64)" on a Mac, the name of the distribution on Linux.
     std::string operatingSystemVersionString;
-    /// The system's release on a Mac, the kernel's on Linux; a part that it does not have is 0.
+    /// The version of the system on a Mac, of the kernel on Linux. A part that the version does not have is 0.
     struct {
         std::int64_t major = 0, minor = 0, patch = 0;
     } operatingSystemVersion;
 
-    /// Asks the system anew at every call.
+    /// Returns the current facts; asks the system at every call.
     static ProcessInfo current();
 };
 

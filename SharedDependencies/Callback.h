@@ -12,17 +12,17 @@ namespace ZULMetaData {
 template <class Signature>
 class Callback;
 
-/// Holds anything that can be called with `Arguments` and returns a `Result`: a lambda, a function, a `std::function`.
-/// An empty one must not be called. Copies share what they hold.
+/// Holds a function: a lambda, a pointer to a function, a `std::function` or any other object that can be called with
+/// `Arguments` and returns a `Result`. An empty callback must not be called. Copies share what they hold.
 ///
-/// It takes the place of `std::function` in public headers, because <functional> alone is as long as all of them.
+/// Public headers use this instead of `std::function`, because <functional> would make them twice as long.
 template <class Result, class... Arguments>
 class Callback<Result(Arguments...)> {
 public:
     Callback() = default;
-    Callback(std::nullptr_t) {} ///< empty
+    Callback(std::nullptr_t) {} ///< creates an empty callback
 
-    /// Holds `function`, which is moved in. A null pointer or an empty `std::function` makes an empty callback.
+    /// Moves `function` in. If it is a null pointer or an empty `std::function`, the callback is empty.
     template <class Function>
     requires(!std::is_same_v<Function, Callback> && std::is_invocable_r_v<Result, Function&, Arguments...>)
         Callback(Function function) {
@@ -35,12 +35,12 @@ public:
         held_ = std::make_shared<Function>(std::move(function));
     }
 
-    /// Calls what is held, and lets its exceptions through.
+    /// Calls the function. Its exceptions pass through.
     Result operator()(Arguments... arguments) const {
         return call_(held_.get(), std::forward<Arguments>(arguments)...);
     }
 
-    explicit operator bool() const { return call_ != nullptr; } ///< false if it is empty
+    explicit operator bool() const { return call_ != nullptr; } ///< returns false if the callback is empty
 
 private:
     Result (*call_)(void*, Arguments...) = nullptr;

@@ -1,6 +1,6 @@
 #pragma once
 
-// Who made a recording: the 56-byte creator record of a movie's recording info.
+// The 56-byte record of who made a recording, which is part of the recording info of a movie.
 
 #include "Export.h"
 
@@ -10,20 +10,27 @@
 
 namespace ZULMetaData {
 
-/// Three texts in fixed fields, written to disk as they lie in memory: name (24 bytes), version (16) and
-/// platform version (16). Each is UTF-8 and always ends with a zero byte; a text too long for its field is cut
-/// behind its last whole character.
+/// Holds three texts in fixed fields: name (24 bytes), version (16) and platform version (16). It is written to disk as
+/// it lies in memory. Each text is UTF-8 and ends with a zero byte. A text that is too long for its field is cut after
+/// the last whole character that fits.
 class ZULMETADATA_API CreatorAttributes {
 public:
-    void setName(const std::string& name);       ///< in every movie the platform's, which readers look at
-    void setVersion(const std::string& version); ///< of the application that recorded
-    void setPlatformVersion(const std::string& platformVersion); ///< of the operating system, such as "6.1.0"
+    /// Sets the name. In every movie it is the name of the platform, by which readers tell platforms apart.
+    void setName(const std::string& name);
+    /// Sets the version of the application that made the recording.
+    void setVersion(const std::string& version);
+    /// Sets the version of the operating system, such as "6.1.0".
+    void setPlatformVersion(const std::string& platformVersion);
 
-    std::string name() const;            ///< up to its zero byte, or to the field's end where a file lacks that
-    std::string version() const;         ///< likewise
-    std::string platformVersion() const; ///< likewise
+    /// Each returns its text up to the zero byte, or the whole field if a file has no zero byte there.
+    ///@{
+    std::string name() const;
+    std::string version() const;
+    std::string platformVersion() const;
+    ///@}
 
-    static std::string platformNameMac(); ///< "Mac", which is stored as the name wherever a movie is recorded
+    /// Returns "Mac". It is stored as the name on every platform.
+    static std::string platformNameMac();
 
 private:
     char name_[24] = {};

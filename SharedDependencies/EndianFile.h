@@ -1,7 +1,6 @@
 #pragma once
 
-// Opening files the way the whole library does, and the byte order and position
-// helpers that its containers need.
+// Opens files in the way that the whole library does, and converts positions and byte order.
 
 #include "Export.h"
 
@@ -12,24 +11,26 @@
 
 namespace ZULMetaData {
 
-// A pipe cannot be opened, whatever waits at its other end: no opening ever hangs. `errno` says why one failed.
+// These functions never wait: they refuse to open a pipe. If opening fails, they set the fail bit of the stream, and
+// `errno` says why; otherwise they clear its state.
 
-/// Opens `path` with `mode` plus the input mode. Sets the fail bit where it cannot; otherwise clears the state.
+/// Opens `path` with `mode` plus the input mode.
 ZULMETADATA_API void fileOpen(std::ifstream& stream, const char* path, std::ios_base::openmode mode);
 
-/// Opens `path` with `mode` plus the output mode. Sets the fail bit where it cannot; otherwise clears the state.
+/// Opens `path` with `mode` plus the output mode.
 ZULMETADATA_API void fileOpen(std::ofstream& stream, const char* path, std::ios_base::openmode mode);
 
-/// Opens `path` with `mode` as given. Sets the fail bit where it cannot; otherwise clears the state.
+/// Opens `path` with `mode`.
 ZULMETADATA_API void fileOpen(std::fstream& stream, const char* path, std::ios_base::openmode mode);
 
-/// Moves the write position to `position` bytes from the start. A failed seek sets the fail bit.
+/// Moves the write position to `position`, in bytes from the start. Sets the fail bit if that fails.
 ZULMETADATA_API void seekWritePos(std::ostream& stream, std::int64_t position);
 
-/// -1 for the position of a stream that has failed.
+/// Returns the position as a number of bytes, or -1 if it is the position of a failed stream.
 ZULMETADATA_API std::int64_t toInt64(std::streampos position);
 
-/// Reverses the byte order: between the host's and that of a movie's atoms, in both directions.
+/// Returns the value with its bytes in reverse order. This converts between the byte order of the host and that of the
+/// atoms in a movie, in both directions.
 constexpr std::uint64_t swapInt(std::uint64_t value) {
     std::uint64_t swapped = 0;
     for (int byte = 0; byte < 8; ++byte, value >>= 8)
@@ -37,7 +38,7 @@ constexpr std::uint64_t swapInt(std::uint64_t value) {
     return swapped;
 }
 
-/// The same for 32 bits.
+/// Does the same for a value of 32 bits.
 constexpr std::uint32_t swapInt(std::uint32_t value) {
     return value << 24 | (value & 0xff00) << 8 | (value >> 8 & 0xff00) | value >> 24;
 }

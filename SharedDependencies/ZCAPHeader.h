@@ -1,6 +1,6 @@
 #pragma once
 
-// The 64-byte recording info that a movie carries in its `ZULR` atom.
+// The recording info of 64 bytes that a movie has in its `ZULR` atom.
 
 #include "CreatorAttributes.h"
 
@@ -9,10 +9,10 @@
 
 namespace ZULMetaData {
 
-/// Written and read as it lies in memory, in the host's byte order (little-endian everywhere we run).
+/// Recording info. It is written and read as it lies in memory, in little-endian byte order.
 struct ZCAPHeader {
-    std::int64_t headerVersion = 0; ///< of the record's layout; 1 is what is written
-    CreatorAttributes creator;      ///< what recorded, and on which system
+    std::int64_t headerVersion = 0; ///< the version of the record's layout; 1 is written
+    CreatorAttributes creator;      ///< the application and the operating system
 };
 
 static_assert(sizeof(ZCAPHeader) == 64);

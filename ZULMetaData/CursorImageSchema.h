@@ -1,8 +1,8 @@
 #pragma once
 
-// The layout of a cursor image entry, as two lists of field steps: what every entry begins with, and the data
-// part. A step says for which stream versions its field exists, when it is present, and where its bytes lie in
-// memory. A later version appends steps; older readers skip what they do not know.
+// The layout of a cursor image entry, as two lists of steps with one step for each field: the fields at the beginning
+// of every entry, and the fields of the data part. A step says which versions of the stream have the field, when an
+// entry has it, and where its bytes are in memory. A later version appends steps; older readers skip them.
 
 #include "../SharedDependencies/Export.h"
 #include "ZULMMetaDataCommon.h"
@@ -13,66 +13,68 @@
 
 namespace ZULMetaData {
 
-/// One entry while it is written or read. Image and time belong to the caller.
+/// An entry while it is written or read. The caller owns the image and the time.
 struct Record {
-    CursorImage& image;                 ///< what is written, or read into
+    CursorImage& image;                 ///< the image that is written or filled
     double& timestamp;                  ///< seconds
-    std::uint32_t entrySize = 0;        ///< bytes behind this field
-    std::uint32_t justMetadataSize = 0; ///< bytes of the data part
+    std::uint32_t entrySize = 0;        ///< the number of bytes after this field
+    std::uint32_t justMetadataSize = 0; ///< the number of bytes in the data part
 };
 
-/// Where a field's bytes are. No data and a size other than 0 means that memory for the field ran out.
+/// The place of a field's bytes. If `data` is null and `size` is not 0, there was not enough memory for the field.
 struct FieldInfo {
-    unsigned char* data; ///< inside the record or its image, valid as long as they are
+    unsigned char* data; ///< points into the record or its image, and is valid as long as they are
     std::uint32_t size;  ///< in bytes
 };
 
 /// One field of an entry.
 struct SchemaFieldStep {
-    using Condition = bool (*)(const Record&);  ///< asked when the fields in front are known
-    using FieldGetter = FieldInfo (*)(Record&); ///< called where the field is present
+    using Condition = bool (*)(const Record&);  ///< called when the fields before this one are known
+    using FieldGetter = FieldInfo (*)(Record&); ///< called if the entry has the field
 
-    std::string_view name;   ///< never stored
-    std::int32_t minVersion; ///< of the streams that have the field
-    std::int32_t maxVersion; ///< the last one that has it; 99 for any that may come
-    Condition condition;     ///< whether the field is present in an entry
-    FieldGetter fieldGetter; ///< where its bytes lie in memory
+    std::string_view name;   ///< the name of the field; it is never stored
+    std::int32_t minVersion; ///< the first version of streams with this field
+    std::int32_t maxVersion; ///< the last version of streams with this field; 99 if there is no last one yet
+    Condition condition;     ///< returns whether an entry has the field
+    FieldGetter fieldGetter; ///< returns where the bytes of the field are
 
-    /// Whether streams of this version have the field.
+    /// Returns whether streams of this version have the field.
     constexpr bool existsIn(int version) const { return minVersion <= version && version <= maxVersion; }
 };
 
-/// The steps are constants, so a schema costs nothing to build and its lists outlive it.
+/// The steps of one version. They are constants: a schema costs nothing to create, and its lists stay valid after it.
 class ZULMETADATA_API CursorImageSchema {
 public:
-    using Steps = std::span<const SchemaFieldStep>; ///< in the order in which the fields are stored
+    using Steps = std::span<const SchemaFieldStep>; ///< steps in the order in which the fields are stored
 
-    /// Any version is accepted; below 1 and above 99 no step takes part.
+    /// Accepts any version. A version below 1 or above 99 has no fields.
     explicit CursorImageSchema(int version) : version_(version) {}
-    CursorImageSchema(const CursorImageSchema&) = default;            ///< copies the version alone
-    CursorImageSchema& operator=(const CursorImageSchema&) = default; ///< likewise
+    CursorImageSchema(const CursorImageSchema&) = default;            ///< copies the version
+    CursorImageSchema& operator=(const CursorImageSchema&) = default; ///< copies the version
     virtual ~CursorImageSchema() = default;
 
-    /// What every entry begins with: its size, time, identifier, and the data part's size.
+    /// Returns the steps at the beginning of every entry: its size, its time, its identifier, and the size of the data
+    /// part.
     virtual Steps GetBaseInfoSteps() const;
-    virtual Steps GetDataSteps() const; ///< the data part: the image and what belongs to it
+    virtual Steps GetDataSteps() const; ///< returns the steps of the data part: the image and the fields about it
 
-    /// Fills in both sizes of the record from what its image holds.
+    /// Computes both sizes of the record from its image.
     virtual void CalculateMetadataSizes(Record& record) const;
 
-    /// Sums the steps that take part and are present. Calls their getters.
+    /// Returns the sum of the sizes of all fields that the version and the record have. Calls their getters.
     std::uint32_t GetSizeOfSchemaFieldSteps(Steps steps, Record& record) const;
 
-    /// Bytes of the record's image: in version 1, whose entries do not store it, what the data part leaves.
+    /// Returns the size of the record's image. Entries of version 1 do not store it; there it is the rest of the data
+    /// part.
     std::uint32_t GetImageSize(const Record& record) const;
 
-    bool AlwaysFn(const Record& record) const; ///< true: the condition of fields that no entry lacks
+    bool AlwaysFn(const Record& record) const; ///< returns true; the condition of fields that every entry has
 
-    /// Whether the record has, or while reading is about to get, an image.
+    /// Returns whether the record has an image, or is about to get one while it is read.
     bool HasImageFn(const Record& record) const;
 
-    /// The getter of the image's bytes. Where the image has a size but no data, it allocates a zeroed buffer of
-    /// that size, which then belongs to the image.
+    /// Returns the getter of the image bytes. If the image has a size but no data, the getter allocates a buffer of
+    /// zeros of that size, which then belongs to the image.
     SchemaFieldStep::FieldGetter GetImageFieldInfoFn() const;
 
 private:

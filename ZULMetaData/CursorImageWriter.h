@@ -1,6 +1,6 @@
 #pragma once
 
-// Writes and reads one cursor image entry by walking the steps of its schema. Version 2, with n bytes of image:
+// Writes and reads a cursor image entry, step by step along its schema. The layout of version 2, with n bytes of image:
 //
 //     0   entrySize = 40 + n        20  justMetadataSize = 20 + n   32      hotspotY
 //     4   timestamp                 24  imageSizeV2 = n             36      imageData
@@ -14,23 +14,25 @@
 
 namespace ZULMetaData {
 
-/// Made for one entry. Never looks at the state of the stream.
+/// Writes one entry. It never checks the state of the stream.
 class ZULMETADATA_API CursorImageWriter {
 public:
-    explicit CursorImageWriter(int version) : version_(version) {} ///< that of the stream
+    explicit CursorImageWriter(int version) : version_(version) {} ///< takes the version of the stream
 
-    void Write(std::ostream& stream, const FieldInfo& field); ///< zeros where the field has no data
+    void Write(std::ostream& stream, const FieldInfo& field); ///< writes zeros if the field has no data
 
     /// Computes the sizes of the record, then writes both parts of the entry.
     void WriteCursorImageMetaData(std::ostream& stream, const CursorImageSchema& schema, Record& record);
 
-    /// The first part alone, with the sizes that the record has.
+    /// Writes the first part only, with the sizes that the record has.
     void WriteBaseInfo(std::ostream& stream, const CursorImageSchema& schema, Record& record);
 
-    /// The data part alone.
+    /// Writes the data part only.
     void WriteMetaDataFields(std::ostream& stream, const CursorImageSchema& schema, Record& record);
 
-    std::uint32_t bytesWritten() const { return bytesWritten_; } ///< of the entry, by all calls so far
+    std::uint32_t bytesWritten() const {
+        return bytesWritten_;
+    } ///< returns the number of bytes that all calls have written
 
 private:
     void writeSteps(std::ostream& stream, CursorImageSchema::Steps steps, Record& record);
@@ -39,27 +41,29 @@ private:
     std::int32_t version_;
 };
 
-/// Made for one entry.
+/// Reads one entry.
 class ZULMETADATA_API CursorImageReader {
 public:
-    explicit CursorImageReader(int version) : version_(version) {} ///< as the stream's header says
+    explicit CursorImageReader(int version) : version_(version) {} ///< takes the version in the stream's header
 
-    void Read(std::istream& stream, const FieldInfo& field); ///< what the input lacks stays as it was
+    void Read(std::istream& stream, const FieldInfo& field); ///< bytes that the input lacks are not changed
 
-    /// Both parts of an entry.
+    /// Reads both parts of an entry.
     void ReadCursorImageMetaData(std::istream& stream, const CursorImageSchema& schema, Record& record);
 
-    /// Throws `std::runtime_error` "invalid meta data entry" where the input ends in front of one of the fields.
+    /// Reads the first part. Throws `std::runtime_error` "invalid meta data entry" if the input ends before one of the
+    /// fields.
     void ReadBaseInfo(std::istream& stream, const CursorImageSchema& schema, Record& record);
 
-    /// Replaces the image. Stops quietly at the first field that does not fit into the data part or lies behind
-    /// the end of the input, and skips what is left of the data part. An image that does not fit leaves neither
-    /// data nor size; one cut short by the end of the input is filled up with zeros.
+    /// Reads the data part and replaces the image. Stops without an error at the first field that does not fit into the
+    /// data part or is beyond the end of the input, and skips the rest of the data part. If the image does not fit, the
+    /// record has neither data nor size afterwards. If the input ends inside the image, the missing bytes are zeros.
     void ReadMetaDataFields(std::istream& stream, const CursorImageSchema& schema, Record& record);
 
-    void IgnoreLeftoverBytes(std::istream& stream, std::uint32_t count); ///< fewer where the input ends
+    void IgnoreLeftoverBytes(std::istream& stream,
+                             std::uint32_t count); ///< skips `count` bytes, or all bytes until the end of the input
 
-    /// Of the data part.
+    /// Returns the number of bytes of the data part that have not been read.
     std::uint32_t bytesLeft() const { return bytesLeft_; }
 
 private:
@@ -70,7 +74,7 @@ private:
     std::uint32_t bytesLeft_ = 0;
 };
 
-/// Writes an entry whose schema and record the caller holds.
+/// Writes an entry with a schema and a record of the caller.
 template <class Schema, class R>
 void metaDataWriteWithSchema(Schema& schema, R& record, std::ostream& stream, int version) {
     CursorImageWriter(version).WriteCursorImageMetaData(stream, schema, record);
@@ -80,7 +84,7 @@ namespace detail {
 
 ZULMETADATA_API void writeCursorImageEntry(double time, const CursorImage& image, std::ostream& stream, int version);
 
-/// Gives the bytes that the entry took; meaningless where the input ended inside it.
+/// Returns the number of bytes that the entry took. The number means nothing if the input ended inside the entry.
 ZULMETADATA_API std::uint64_t readCursorImageEntry(std::istream& stream, double& time, CursorImage& image, int version);
 
 } // namespace detail

@@ -1,13 +1,13 @@
 #pragma once
 
-// How every decoder reports an entry whose beginning is missing.
+// The exception that every decoder throws for an entry whose beginning is missing.
 
 #include <istream>
 #include <stdexcept>
 
 namespace ZULMetaData::detail {
 
-/// Nothing more will come: the end of the input, or a device that failed.
+/// Returns whether no more bytes will come, because the input has ended or its device has failed.
 inline bool inputEnded(const std::istream& stream) {
     return stream.eof() || stream.bad();
 }

@@ -8,8 +8,8 @@
 
 namespace ZULMetaData {
 
-/// Who made a movie: what its top-level `ZULR` atoms hold, in the order of the file. The last one was stamped last.
-/// One too short to hold the record is left out.
+/// Returns who made a movie: the records in its top-level `ZULR` atoms, in the order of the file. The last one is the
+/// newest. An atom that is too short for a record is left out.
 ZULMETADATA_API std::vector<ZCAPHeader> readRecordingInfo(MetaDataParser& movie);
 
 } // namespace ZULMetaData

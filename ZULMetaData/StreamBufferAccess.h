@@ -1,8 +1,8 @@
 #pragma once
 
-// The inside of a stream buffer: bytes go straight into its put area and come straight out of its get area. A call
-// of `write` or `read` on a stream costs five to twenty times as much as the 16 bytes of an entry that it moves.
-// The streams stay usable by anybody in between, for the areas are always left as the buffer itself would leave them.
+// Direct access to the put area and the get area of a stream buffer. Calling `write` or `read` on a stream costs five
+// to twenty times as much as copying the 16 bytes of an entry. The areas are always left as the buffer itself would
+// leave them, so the streams can be used normally at any time.
 
 #include "../SharedDependencies/Export.h"
 
@@ -14,8 +14,8 @@
 
 namespace ZULMetaData::detail {
 
-/// Names the protected members of a stream buffer from within a class derived from it, which is what makes pointers
-/// to them usable on any stream buffer.
+/// Gives access to the protected members of any stream buffer. A derived class may form pointers to these members, and
+/// the pointers can be used on every stream buffer.
 class StreamBufferAccess : private std::streambuf {
 public:
     static std::size_t room(const std::streambuf& buffer) {
@@ -30,13 +30,13 @@ public:
         (buffer.*&StreamBufferAccess::pbump)(static_cast<int>(count));
     }
 
-    /// Forgets what was put but not yet written out.
+    /// Discards the bytes in the put area that have not been written out.
     static void discardPut(std::streambuf& buffer) {
         (buffer.*&StreamBufferAccess::pbump)(
             static_cast<int>((buffer.*&StreamBufferAccess::pbase)() - (buffer.*&StreamBufferAccess::pptr)()));
     }
 
-    /// Takes `less` bytes off an empty put area until it is written out for the first time.
+    /// Shortens an empty put area by `less` bytes until it is written out for the first time.
     static void shortenPutArea(std::streambuf& buffer, std::size_t less) {
         if (room(buffer) == capacity(buffer) && room(buffer) > less)
             (buffer.*&StreamBufferAccess::setp)(putPosition(buffer), (buffer.*&StreamBufferAccess::epptr)() - less);
@@ -45,7 +45,7 @@ public:
     static std::size_t available(const std::streambuf& buffer) {
         return static_cast<std::size_t>((buffer.*&StreamBufferAccess::egptr)() - (buffer.*&StreamBufferAccess::gptr)());
     }
-    /// Read already, and still there.
+    /// Returns the number of bytes that were read and are still in the get area.
     static std::size_t passed(const std::streambuf& buffer) {
         return static_cast<std::size_t>((buffer.*&StreamBufferAccess::gptr)() - (buffer.*&StreamBufferAccess::eback)());
     }
@@ -54,23 +54,24 @@ public:
         moveGet(buffer, static_cast<std::ptrdiff_t>(count));
     }
 
-    /// By no more than is available or passed.
+    /// Moves the read position by `distance`, which must stay inside the get area.
     static void moveGet(std::streambuf& buffer, std::ptrdiff_t distance) {
         (buffer.*&StreamBufferAccess::gbump)(static_cast<int>(distance));
     }
 };
 
-/// Where `size` bytes can be put right now, to be followed by `StreamBufferAccess::advancePut`; else null.
+/// Returns the place for the next `size` bytes, or null if they do not fit into the put area. After the bytes are put
+/// there, call `StreamBufferAccess::advancePut`.
 inline char* placeFor(std::ostream& stream, std::size_t size) {
     const bool isPlain = stream.good() && !(stream.flags() & std::ios_base::unitbuf);
     std::streambuf& buffer = *stream.rdbuf();
     return isPlain && StreamBufferAccess::room(buffer) >= size ? StreamBufferAccess::putPosition(buffer) : nullptr;
 }
 
-/// Fills the put area to its end before it is written out, so that blocks keep one size.
+/// Writes the bytes. Fills the put area to its end before it is written out, so all blocks have the same size.
 ZULMETADATA_API void writeAcrossBlocks(std::ostream& stream, const char* bytes, std::size_t size);
 
-/// As `stream.write`, at the cost of a copy where the put area has room.
+/// Does the same as `stream.write`, at the cost of a copy if the put area has room.
 inline void writeBytes(std::ostream& stream, const char* bytes, std::size_t size) {
     if (char* place = placeFor(stream, size)) {
         std::memcpy(place, bytes, size);
@@ -80,7 +81,8 @@ inline void writeBytes(std::ostream& stream, const char* bytes, std::size_t size
     }
 }
 
-/// As `stream.read`, at the cost of a copy where the get area holds the bytes. Gives how many have been read.
+/// Does the same as `stream.read`, at the cost of a copy if the get area holds the bytes. Returns the number of bytes
+/// read.
 inline std::size_t readBytes(std::istream& stream, char* bytes, std::size_t size) {
     if (stream.good() && StreamBufferAccess::available(*stream.rdbuf()) >= size) {
         std::memcpy(bytes, StreamBufferAccess::getPosition(*stream.rdbuf()), size);
@@ -91,8 +93,8 @@ inline std::size_t readBytes(std::istream& stream, char* bytes, std::size_t size
     return static_cast<std::size_t>(stream.gcount());
 }
 
-/// Whether the end of the input comes next. As `stream.peek()`, which then sets the state, but without its cost where
-/// the get area holds another byte.
+/// Returns whether the input has ended, and sets the state as `stream.peek()` does, but costs less if the get area
+/// holds another byte.
 inline bool isAtEnd(std::istream& stream) {
     if (stream.good() && StreamBufferAccess::available(*stream.rdbuf()) > 0)
         return false;

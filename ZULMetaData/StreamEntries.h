@@ -1,7 +1,7 @@
 #pragma once
 
-// The whole entries of a stream, one after the other, without believing what they say about themselves: an entry that
-// is given lies inside the bytes that are there, and is decoded only where its inner sizes agree with its own.
+// Walks along the whole entries of a stream without trusting their sizes. Every entry that is returned lies inside the
+// existing bytes, and an entry is decoded only if the sizes inside it agree with its own size.
 //
 //     StreamEntries entries(readingFrom(file), length);
 //     while (const auto entry = entries.next())
@@ -20,36 +20,37 @@
 
 namespace ZULMetaData {
 
-/// Where an entry is, counted from the stream's header on. The size counts all of it.
+/// The place of an entry in its stream.
 struct StreamEntry {
-    std::uint64_t offset = 0; ///< from the header's first byte on
-    std::uint64_t size = 0;   ///< in bytes; of an entry that carries its size, the size field is part of it
+    std::uint64_t offset = 0; ///< counted from the first byte of the header
+    std::uint64_t size = 0;   ///< in bytes; includes the size field if the entry has one
 
-    std::uint64_t end() const { return offset + size; } ///< where the next entry begins
+    std::uint64_t end() const { return offset + size; } ///< returns where the next entry begins
 };
 
-/// Walks forward once, reading large pieces; needs little memory but for the bytes of one entry.
+/// Walks forward once and reads large pieces. It needs memory for one entry and little more.
 class ZULMETADATA_API StreamEntries {
 public:
-    /// `read` gives the stream's bytes by their position behind its start; it holds `length` of them.
+    /// Takes a function that reads the bytes of the stream by their position in it, and the number of these bytes.
     StreamEntries(ReadBytes read, std::uint64_t length);
 
-    /// None where there are too few bytes for one; there are no entries then.
+    /// Returns the header. It is empty if the stream is shorter than a header; there are no entries then.
     const std::optional<MetaDataHeader>& header() const { return header_; }
 
-    /// The size of every entry, 0 where each carries its own. The header's, unless a reader goes by another one.
+    /// Sets the size of every entry; 0 means that each entry has its own size. The default is the size in the header.
     void setEntrySize(std::uint32_t size) { entrySize_ = size; }
 
-    /// None behind the last whole entry.
+    /// Returns the next whole entry, or nothing after the last one.
     std::optional<StreamEntry> next();
 
-    /// Valid until the next call of anything here. Fewer bytes than the entry has where they cannot be read.
+    /// Returns the bytes of the entry, or fewer if they cannot be read. They are valid until the next call of any
+    /// function of this object.
     std::string_view bytesOf(const StreamEntry& entry);
 
-    /// Header and whole entries given so far.
+    /// Returns the number of bytes of the header and of the entries returned so far.
     std::uint64_t wholeBytes() const { return position_; }
 
-    /// What stands there, once there is no next entry.
+    /// Returns what follows the last whole entry, once `next` has returned nothing.
     StreamExtent::End end() const { return end_; }
 
 private:
@@ -67,16 +68,16 @@ private:
     std::size_t windowSize_ = 0;
 };
 
-/// A decoded entry.
+/// An entry that was decoded.
 template <StreamValue T>
 struct TimedValue {
     double time = 0; ///< in seconds
-    T value{};       ///< texts as they are stored, perhaps not UTF-8
+    T value{};       ///< texts are as they are stored and may be invalid UTF-8
 };
 
-/// An entry by the layout of its value. None where its bytes do not fit it: too few or too many, or an inner size that
-/// disagrees with them. Fields of a cursor image that do not fit into its data part are left out, as readers do. A
-/// list's time is the one that its texts repeat; 0 for an empty one.
+/// Decodes the bytes of an entry that holds a `T`. Returns nothing if they do not fit: if there are too few or too
+/// many, or if a size inside the entry disagrees with them. Fields of a cursor image that do not fit into its data part
+/// are left out, as readers do. The time of a list is the time of its texts, or 0 if the list is empty.
 template <StreamValue T>
 std::optional<TimedValue<T>> decodeEntry(std::string_view bytes, int version);
 

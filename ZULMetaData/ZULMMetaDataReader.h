@@ -1,6 +1,6 @@
 #pragma once
 
-// Reads one metadata stream, alone in a file or inside a container, and hands each entry to an observer.
+// Reads a metadata stream, from a file of its own or inside a container, and passes each entry to an observer.
 //
 //     struct Printer : DataStreamObserver<Point> {
 //         bool dataRead(double time, const Point& value) override { std::cout << time << value; return true; }
@@ -23,38 +23,42 @@
 
 namespace ZULMetaData {
 
-/// What gets the entries of a stream. Never deleted by its readers.
+/// Receives the entries of a stream. Readers never delete an observer.
 template <class T>
 class ZULMETADATA_API DataStreamObserver {
 public:
-    /// `time` is in seconds; a list of strings always comes with 0. False ends the parse.
+    /// Called for every entry. `time` is in seconds; it is always 0 for a list of strings. Return false to end the
+    /// parse.
     virtual bool dataRead(double time, const T& value) = 0;
 
 protected:
     ~DataStreamObserver() = default;
 };
 
-/// Reads streams of one type of value; holds nothing.
+/// Reads streams of one type of value. It has no state.
 template <StreamValue T>
 struct MetaDataReader {
-    /// Reads the stream whose header stands at `start`; `length` counts the header. Entries are read while they
-    /// begin in front of the end, whole even where they run past it. With `version` -1 every version up to the
-    /// current one is read, else also exactly that version; any other is refused with one line on standard output.
+    /// Reads the stream whose header is at `start`; `length` includes the header. An entry that begins before the end
+    /// of the stream is read as a whole, even if it extends past the end. With `version` -1 every version up to the
+    /// current one is accepted; otherwise `version` itself is accepted as well. A stream of any other version is
+    /// refused with a line on standard output.
     ///
-    /// Throws `std::runtime_error` "invalid meta data entry" where the input ends before the time (or the size)
-    /// of an entry does; what came before has been delivered. A value cut short is delivered with what is there.
+    /// Throws `std::runtime_error` "invalid meta data entry" if the input ends inside the time or the size of an entry.
+    /// The entries before it have been delivered then. A value that is cut short is delivered with the bytes that
+    /// exist.
     static void parseStream(DataStreamObserver<T>& observer, std::istream& stream, std::uint64_t start,
                             std::uint64_t length, int version);
 
-    /// Whether `parseStream` accepts such a stream. An unknown kind may cause a line on standard output.
+    /// Returns whether `parseStream` accepts a stream with this header. For an unknown kind it may print a line on
+    /// standard output.
     static bool IsSupportedVersion(const MetaDataHeader& header, int version);
 };
 
-/// Reads one entry at the stream's position, of the version that the stream's header names. Texts are appended to
+/// Reads one entry at the position of `stream`. `version` is the version in the stream's header. Texts are appended to
 /// `value`. Throws as `parseStream` does.
 ///
-/// The size of a text is believed: where the input ends early, its last character is repeated (zeros where there
-/// was none), and a size below 8 wraps around. The time of a list is left alone.
+/// The size of a text is trusted without a check. If the input ends inside the text, its last character is repeated, or
+/// zeros are used if there is none. A size below 8 wraps around. The time of a list is not changed.
 template <StreamValue T>
 void metaDataRead(std::istream& stream, double* time, T* value, int version);
 
@@ -64,12 +68,12 @@ namespace detail {
 
 ZULMETADATA_API bool isSupportedVersion(const MetaDataHeader& header, int version);
 
-/// Clears the stream's state, seeks to `start` and reads the header there. False where no entry can follow; a
-/// refused version has then been reported.
+/// Clears the state of the stream, seeks to `start` and reads the header there. Returns false if no entries can follow;
+/// if the version was refused, this has been printed.
 ZULMETADATA_API bool readSupportedHeader(std::istream& stream, std::uint64_t start, int version,
                                          MetaDataHeader& header);
 
-/// The readers give the bytes that the entry took; meaningless where the input ended inside it.
+/// Return the number of bytes that the entry took. The number means nothing if the input ended inside the entry.
 ZULMETADATA_API std::uint64_t readStringEntry(std::istream& stream, double& time, std::string& text);
 ZULMETADATA_API std::uint64_t readStringListEntry(std::istream& stream, std::list<std::string>& texts);
 
@@ -85,8 +89,8 @@ std::uint64_t readFixedEntry(std::istream& stream, double& time, T& value) {
     return entry.size();
 }
 
-/// Delivers the entries that lie in the get area as a whole, with a byte behind them: there the end of the input is
-/// out of sight, and an entry costs two loads and the call. False where the observer ended the parse.
+/// Delivers the entries that are in the get area as a whole, with at least one byte after them. The end of the input
+/// need not be checked there, so an entry costs two loads and the call. Returns false if the observer ended the parse.
 template <FixedSizeValue T>
 bool readBufferedEntries(DataStreamObserver<T>& observer, std::istream& stream, std::uint64_t& position,
                          std::uint64_t end) {
@@ -106,7 +110,7 @@ bool readBufferedEntries(DataStreamObserver<T>& observer, std::istream& stream, 
     return true;
 }
 
-/// A text keeps its memory from entry to entry.
+/// Resets `value` for the next entry. A text keeps its memory.
 template <StreamValue T>
 void renew(T& value) {
     if constexpr (std::same_as<T, std::string>)
@@ -146,7 +150,7 @@ void MetaDataReader<T>::parseStream(DataStreamObserver<T>& observer, std::istrea
     if (!detail::readSupportedHeader(stream, start, version, header))
         return;
     const std::uint64_t end = start + length;
-    std::uint64_t position = start + s_metaDataHeaderSize; // counted: asking a file stream is a system call
+    std::uint64_t position = start + s_metaDataHeaderSize; // counted here, because tellg() is a system call
     T value{};
     while (stream.good() && position < end) {
         if constexpr (FixedSizeValue<T>) {
@@ -161,7 +165,7 @@ void MetaDataReader<T>::parseStream(DataStreamObserver<T>& observer, std::istrea
         if (!observer.dataRead(time, value))
             return;
         if (taken == 0 || detail::isAtEnd(stream))
-            return; // a version without fields would never come to an end
+            return; // a version without fields would never reach the end
         position += taken;
     }
 }

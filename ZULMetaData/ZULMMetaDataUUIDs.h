@@ -1,6 +1,6 @@
 #pragma once
 
-// The header in front of every metadata stream, and the registry of the kinds of streams.
+// The header at the beginning of every metadata stream, and the registry of the kinds of streams.
 
 #include "../SharedDependencies/Export.h"
 #include "ZULMMetaDataCommon.h"
@@ -13,21 +13,21 @@
 
 namespace ZULMetaData {
 
-/// The first 24 bytes of a stream, stored as they lie in memory. Its entries follow at once.
+/// The first 24 bytes of a stream, stored as they lie in memory. The entries follow directly.
 struct MetaDataHeader {
     ZULMetaData::uuid uuid{};         ///< the kind of the stream
-    std::int32_t version = -1;        ///< the format of its entries
-    std::uint32_t fixedEntrySize = 0; ///< bytes of every entry, time included; 0 where each entry carries its size
+    std::int32_t version = -1;        ///< the version of the format of its entries
+    std::uint32_t fixedEntrySize = 0; ///< bytes of every entry, time included; 0 if each entry has its own size
 };
 
-inline constexpr std::size_t s_metaDataHeaderSize = 24; ///< in bytes; the first entry begins there
+inline constexpr std::size_t s_metaDataHeaderSize = 24; ///< in bytes; the first entry begins at this offset
 
 static_assert(sizeof(MetaDataHeader) == s_metaDataHeaderSize && std::is_trivially_copyable_v<MetaDataHeader>);
 static_assert(offsetof(MetaDataHeader, version) == 16 && offsetof(MetaDataHeader, fixedEntrySize) == 20);
 
 namespace detail {
 
-/// Every kind's identifier is `firstGroup` followed by 7a1f-11e2-83d0-0017f200be7f.
+/// Returns the identifier of a kind: `firstGroup` followed by 7a1f-11e2-83d0-0017f200be7f.
 constexpr uuid kindUUID(std::uint32_t firstGroup) {
     const auto byte = [firstGroup](int shift) { return static_cast<std::uint8_t>(firstGroup >> shift & 0xff); };
     return {
@@ -36,9 +36,9 @@ constexpr uuid kindUUID(std::uint32_t firstGroup) {
 
 } // namespace detail
 
-/// What the header of a stream names its kind by.
+/// The identifiers of the kinds, as they are stored in the headers of streams.
 ///@{
-// 2b7b6af4 is nobody's, and behind 2b7b6afc the numbering goes on at 2b7b6a00.
+// 2b7b6af4 is not used, and after 2b7b6afc the numbers continue at 2b7b6a00.
 inline constexpr uuid s_caretPositionUUID = detail::kindUUID(0x2b7b6aef);
 inline constexpr uuid s_cursorActionUUID = detail::kindUUID(0x2b7b6af0);
 inline constexpr uuid s_cursorImageUUID = detail::kindUUID(0x2b7b6af1);
@@ -64,17 +64,17 @@ inline constexpr uuid s_cpuUsageUUID = detail::kindUUID(0x2b7b6a08);
 inline constexpr uuid s_hoverRectUUID = detail::kindUUID(0x2b7b6a09);
 ///@}
 
-/// As `s_cursorImageUUID` is printed.
+/// The text of `s_cursorImageUUID`.
 inline constexpr const char* s_cursorImageUUIDAsString = "2b7b6af1-7a1f-11e2-83d0-0017f200be7f";
 
-/// One kind of stream: what it is called, how its header names it, and the version that is written today.
+/// One kind of stream: its name, its identifier, and the version that is written today.
 struct MetaDataKind {
-    std::string_view name;  ///< such as "cursorLocation", everywhere that people meet it
-    ZULMetaData::uuid type; ///< in the headers of its streams
-    int currentVersion;     ///< readers know it and all before it, from 1 on
+    std::string_view name;  ///< such as "cursorLocation"; used in reports and on the command line
+    ZULMetaData::uuid type; ///< the identifier in the headers of its streams
+    int currentVersion;     ///< readers accept the versions from 1 to this one
 };
 
-/// The registry, with the six kinds that nothing here writes.
+/// The registry of all kinds. The library has writers and parsers for all but six of them.
 inline constexpr std::array<MetaDataKind, 23> s_metaDataKinds{{
     {"caretPosition", s_caretPositionUUID, 1},
     {"cursorAction", s_cursorActionUUID, 1},
@@ -101,18 +101,19 @@ inline constexpr std::array<MetaDataKind, 23> s_metaDataKinds{{
     {"hoverRect", s_hoverRectUUID, 1},
 }};
 
-/// The registered kind of a stream, or null. Silent, unlike `currentVersionForUUID`.
+/// Returns the registered kind with this identifier, or null. Prints nothing, unlike `currentVersionForUUID`.
 ZULMETADATA_API const MetaDataKind* findMetaDataKind(const uuid& type);
 
-/// Its 36 characters, as `operator<<` writes them.
+/// Returns the 36 characters that `operator<<` writes.
 ZULMETADATA_API std::string uuidText(const uuid& type);
 
-/// The name of a registered kind; of any other its identifier, as `uuidText` gives it.
+/// Returns the name of the kind, or the text of the identifier if the kind is not registered.
 ZULMETADATA_API std::string metaDataKindName(const uuid& type);
 
-/// Versions by kind.
+/// Looks up versions of kinds.
 struct ZULMETADATA_API MetaDataUUID {
-    /// The version that is written today; -1 for an unknown kind, with one line on standard output.
+    /// Returns the version that is written today. For an unknown kind it returns -1 and prints a line on standard
+    /// output.
     static int currentVersionForUUID(const uuid& type);
 };
 

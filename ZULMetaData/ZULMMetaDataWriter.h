@@ -1,6 +1,6 @@
 #pragma once
 
-// Writes one metadata stream file: a header, then entries of a time and a value.
+// Writes a metadata stream file: a header, followed by entries of a time and a value.
 //
 //     MetaDataWriter<Point, int, int> writer;
 //     writer.init("CursorLocation.dat", s_cursorLocationUUID, 1);
@@ -25,17 +25,17 @@
 
 namespace ZULMetaData {
 
-/// Bytes of an entry that holds a `T`; 0 where entries vary in size.
+/// Returns the size in bytes of an entry that holds a `T`, or 0 if the entries vary in size.
 template <StreamValue T>
 std::uint32_t metaDataFixedEntrySize();
 
-/// Appends one entry to `stream`, in the layout of the stream `version` (only cursor images have more than one).
-/// Failures show in the state of `stream` alone.
+/// Appends one entry to `stream`. `version` is the version of the stream; only cursor images have more than one. A
+/// failure sets the state of `stream` and is not reported otherwise.
 template <StreamValue T>
 void metaDataWrite(double time, const T& value, std::ostream& stream, int version);
 
-/// Nothing here reports an error: where the file cannot be opened or written, the stream that `getStream` gives
-/// is in a failed state and entries are dropped. `A` and `B` play no part in the format.
+/// Writes a stream file of values of type `T`. No function reports an error: if the file cannot be opened or written,
+/// the stream that `getStream` returns is in a failed state, and entries are dropped. `A` and `B` have no effect.
 template <StreamValue T, class A, class B>
 class ZULMETADATA_API MetaDataWriter {
 public:
@@ -46,18 +46,19 @@ public:
     /// Creates or empties the file at `path` and writes the header.
     void init(const std::string& path, const uuid& typeUuid, int version);
 
-    /// Written and flushed by `init` already.
+    /// Writes the header and flushes it. `init` has already done this.
     void writeHeader(const uuid& typeUuid, int version);
 
-    /// `time` is in seconds on the recording's time line. Without `flush` the entry may stay in the file buffer.
+    /// Appends an entry at `time`, in seconds on the time line of the recording. Without `flush` the entry may stay in
+    /// the buffer.
     void write(double time, const T& value, bool flush);
 
-    /// May be called more than once.
+    /// Writes what is in the buffer and closes the file. May be called more than once.
     void close();
 
-    virtual std::ofstream& getStream() { return stream; } ///< the writer's own; its state tells of failures
+    virtual std::ofstream& getStream() { return stream; } ///< returns the stream of the file; its state shows failures
 
-    /// Closes. An exception from closing (the stream's exception mask is the caller's) ends the process.
+    /// Closes the file. If the caller has set the stream's exception mask, an exception from closing ends the process.
     ~MetaDataWriter() { close(); }
 
 private:
@@ -81,7 +82,7 @@ std::uint32_t metaDataFixedEntrySize() {
 
 namespace detail {
 
-/// Sizes are 32 bits wide on disk; longer texts wrap around.
+/// Returns the size that is stored before an entry. It has 32 bits on disk; the size of a longer text wraps around.
 inline std::uint32_t stringEntrySize(const std::string& text) {
     return static_cast<std::uint32_t>(text.size() + sizeof(double));
 }
@@ -95,7 +96,7 @@ inline void writeStringEntry(double time, const std::string& text, std::ostream&
     writeBytes(stream, text.data(), text.size());
 }
 
-/// The list has no time of its own: every element repeats it.
+/// The list has no time field of its own: every element repeats the time.
 inline void writeStringListEntry(double time, const std::list<std::string>& texts, std::ostream& stream) {
     std::array<std::uint32_t, 2> totalAndCount{sizeof(std::uint32_t), static_cast<std::uint32_t>(texts.size())};
     for (const std::string& text : texts)
@@ -111,7 +112,7 @@ void packFixedEntry(double time, const T& value, char* entry) {
     std::memcpy(entry + sizeof time, &value, sizeof value);
 }
 
-/// Apart from the fast path, which keeps nothing in memory whose address is known elsewhere.
+/// Separate from the fast path, which keeps nothing in memory whose address is known elsewhere.
 template <FixedSizeValue T>
 [[gnu::noinline]] void writeFixedEntryAcrossBlocks(double time, T value, std::ostream& stream) {
     std::array<char, sizeof(double) + sizeof(T)> entry;
@@ -150,7 +151,7 @@ void MetaDataWriter<T, A, B>::init(const std::string& filePath, const uuid& type
     path = filePath;
     if (!buffer)
         buffer = std::make_unique<char[]>(s_bufferSize);
-    if (!stream.is_open()) // of an open file, what waits in the buffer may be lost
+    if (!stream.is_open()) // an open file might lose what is in its buffer
         stream.rdbuf()->pubsetbuf(buffer.get(), s_bufferSize);
     fileOpen(stream, path.c_str(), std::ios_base::binary | std::ios_base::out | std::ios_base::trunc);
     writeHeader(typeUuid, version);
@@ -175,7 +176,7 @@ template <StreamValue T, class A, class B>
 void MetaDataWriter<T, A, B>::close() {
     if (!stream.is_open())
         return;
-    if (stream.bad()) // part of the buffer may be on the disk: written again on closing, it would stand there twice
+    if (stream.bad()) // part of the buffer may be on the disk; closing would write that part a second time
         detail::StreamBufferAccess::discardPut(*stream.rdbuf());
     stream.close();
 }

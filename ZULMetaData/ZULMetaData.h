@@ -1,6 +1,6 @@
 #pragma once
 
-// Everything of the stream core: values, streams, containers.
+// Includes the whole stream core: values, streams, containers.
 
 #include "ContainerLayout.h"
 #include "ContainerRecognition.h"

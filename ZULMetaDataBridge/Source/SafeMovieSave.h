@@ -101,8 +101,8 @@ public:
     /// Throws what `attach` would for these streams, and changes nothing. For those who copy the movie first.
     void checkAttach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse) const;
 
-    /// Appends what `ZULRAtomWriter::writeZULRtoFile` does, without ever ending the process. `creatorName` is not stored:
-    /// on any system the platform's name, "Mac", stands in its place.
+    /// Appends what `ZULRAtomWriter::writeZULRtoFile` does, without ever ending the process. `creatorName` is not
+    /// stored: on any system the platform's name, "Mac", stands in its place.
     StampResult stamp(const std::string& creatorName, const std::string& creatorVersion) const;
 
 private:

@@ -1,6 +1,6 @@
 #pragma once
 
-// What every parser of the family shares: the location of its file, and how a stream is copied out of it.
+// The base of all parsers: the location of the file, and how a stream is copied out of it.
 
 #include "../../../Platform/FileLocation.h"
 #include "../../../SharedDependencies/Export.h"
@@ -11,7 +11,8 @@
 
 namespace ZULMetaData {
 
-/// Opens its file only while it reads. Used by one thread at a time; separate parsers share nothing.
+/// The base class of the parsers. A parser opens its file only while it reads. One thread at a time may use a parser;
+/// separate parsers share nothing.
 class ZULMETADATA_API BaseMetaDataParser {
 public:
     BaseMetaDataParser() = default;
@@ -19,17 +20,17 @@ public:
     BaseMetaDataParser& operator=(const BaseMetaDataParser&) = delete;
     virtual ~BaseMetaDataParser() = default;
 
-    /// Stores the location and runs `setup`. Does not touch the file. Gives the parser itself.
+    /// Stores the location and calls `setup`. Does not open the file. Returns the parser itself.
     BaseMetaDataParser* initWithMetaDataFile(const FileLocation& file);
 
-    virtual void setup() {} ///< does nothing here
+    virtual void setup() {} ///< does nothing; derived classes may override it
 
-    /// The bytes of the file's stream of this type, header included; empty where the file has none, cannot be
-    /// opened or is no container.
+    /// Returns the bytes of the stream of this type, header included. They are empty if the file has no such stream,
+    /// cannot be opened or is not a container.
     std::unique_ptr<std::stringstream> getMetaDataStream(uuid type) const;
 
-    const FileLocation& metaDataFile() const { return metaDataFile_; }       ///< the last one that was given
-    void setMetaDataFile(const FileLocation& file) { metaDataFile_ = file; } ///< counts from the next `read` on
+    const FileLocation& metaDataFile() const { return metaDataFile_; }       ///< returns the location of the file
+    void setMetaDataFile(const FileLocation& file) { metaDataFile_ = file; } ///< sets the file for the next `read`
 
 private:
     FileLocation metaDataFile_;

@@ -4,15 +4,16 @@
 
 namespace ZULMetaData {
 
-/// "action" (text), "rawActionValue" (std::int32_t) and "timestamp" (float, seconds) for every button that was
-/// pressed or released.
+/// Reads the buttons that were pressed or released. Each entry has "action" (text), "rawActionValue" (std::int32_t) and
+/// "timestamp" (float, seconds).
 class CursorActionMetaDataParser final : public KindMetaDataParser<CursorActionKind> {
 public:
     using KindMetaDataParser::KindMetaDataParser;
 
-    /// What the last `read` gave; null before.
+    /// Returns the list of the last `read`, or null before the first one.
     std::shared_ptr<EntryList> cursorActionData() const { return entries(); }
-    void setCursorActionData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
+    /// Replaces that list until the next `read`.
+    void setCursorActionData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); }
 };
 
 } // namespace ZULMetaData

@@ -1,6 +1,6 @@
 #pragma once
 
-// The mechanism of the parser family. A class of the family adds the name of its list.
+// How parsers read. The parser of each kind adds the name of its list.
 
 #include "../../../SharedDependencies/Export.h"
 #include "../../../ZULMetaData/ZULMMetaDataParser.h"
@@ -16,18 +16,20 @@
 
 namespace ZULMetaData {
 
-/// Reads the entries of one kind.
+/// Reads the entries of one kind into a list.
 template <class Kind>
 class ZULMETADATA_API KindMetaDataParser : public BaseMetaDataParser {
 public:
-    KindMetaDataParser() = default; ///< has no file before `initWithMetaDataFile` gives it one
-    explicit KindMetaDataParser(const FileLocation& file) { this->initWithMetaDataFile(file); } ///< opens nothing
+    KindMetaDataParser() = default; ///< creates a parser without a file; call `initWithMetaDataFile`
 
-    /// Reads the file as it is now into a new list, which the parser keeps too; earlier lists stay as they are.
-    /// Empty where the file has no such stream. A damaged entry ends the list.
+    /// Stores the location. Does not open the file.
+    explicit KindMetaDataParser(const FileLocation& file) { this->initWithMetaDataFile(file); }
+
+    /// Reads the file as it is now and returns a new list of its entries. The parser keeps this list too; earlier lists
+    /// do not change. The list is empty if the file has no such stream. It ends before the first damaged entry.
     ///
-    /// Throws `std::invalid_argument` for a text that is not UTF-8 and `std::out_of_range` for system data with
-    /// fewer than four texts; the kept list then holds the entries in front of it.
+    /// Throws `std::invalid_argument` for a text that is not UTF-8, and `std::out_of_range` for system data with fewer
+    /// than four texts. The list that the parser keeps then has the entries before the faulty one.
     std::shared_ptr<EntryList> read() {
         entries_ = std::make_shared<EntryList>();
         MetaDataObserver<typename Kind::Value> observer;
@@ -39,9 +41,10 @@ public:
     }
 
 protected:
-    /// Null before the first `read`.
+    /// Returns the list that is kept, or null before the first `read`.
     const std::shared_ptr<EntryList>& entries() const { return entries_; }
-    void setEntries(std::shared_ptr<EntryList> entries) { entries_ = std::move(entries); } ///< until the next `read`
+    /// Replaces the list until the next `read`.
+    void setEntries(std::shared_ptr<EntryList> entries) { entries_ = std::move(entries); }
 
 private:
     void load(MetaDataObserver<typename Kind::Value>& observer) const {
@@ -52,7 +55,7 @@ private:
         try {
             stream->loadDataType(Kind::type, observer, Kind::version);
         } catch (const std::runtime_error&) {
-            // An entry is cut short. Those in front of it have been collected.
+            // An entry is cut short. The entries before it have been collected.
         }
     }
 

@@ -7,12 +7,12 @@
 
 namespace ZULMetaData {
 
-/// Collects every entry of a stream, in the order in which they come.
+/// Collects all entries of a stream, in its order.
 template <StreamValue T>
 class ZULMETADATA_API MetaDataObserver : public DataStreamObserver<T> {
 public:
-    std::vector<T> values;     ///< in the order of the stream
-    std::vector<double> times; ///< in seconds, one for each value
+    std::vector<T> values;     ///< the values, in the order of the stream
+    std::vector<double> times; ///< the time of each value, in seconds
 
     bool dataRead(double time, const T& value) override {
         values.push_back(value);

@@ -4,14 +4,15 @@
 
 namespace ZULMetaData {
 
-/// "scaleFactor" (std::int32_t) and "timestamp" (float, seconds) for the display's scale factor.
+/// Reads the scale factor of the display. The entry has "scaleFactor" (std::int32_t) and "timestamp" (float, seconds).
 class ScaleFactorMetaDataParser final : public KindMetaDataParser<ScaleFactorKind> {
 public:
     using KindMetaDataParser::KindMetaDataParser;
 
-    /// What the last `read` gave; null before.
+    /// Returns the list of the last `read`, or null before the first one.
     std::shared_ptr<EntryList> scaleFactorData() const { return entries(); }
-    void setScaleFactorData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
+    /// Replaces that list until the next `read`.
+    void setScaleFactorData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); }
 };
 
 } // namespace ZULMetaData

@@ -4,14 +4,15 @@
 
 namespace ZULMetaData {
 
-/// "comment" (text) and "timestamp" (float, seconds) for every slide.
+/// Reads the comments on slides. Each entry has "comment" (text) and "timestamp" (float, seconds).
 class SlideInfoCommentMetaDataParser final : public KindMetaDataParser<SlideInfoCommentKind> {
 public:
     using KindMetaDataParser::KindMetaDataParser;
 
-    /// What the last `read` gave; null before.
+    /// Returns the list of the last `read`, or null before the first one.
     std::shared_ptr<EntryList> slideCommentData() const { return entries(); }
-    void setSlideCommentData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
+    /// Replaces that list until the next `read`.
+    void setSlideCommentData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); }
 };
 
 } // namespace ZULMetaData

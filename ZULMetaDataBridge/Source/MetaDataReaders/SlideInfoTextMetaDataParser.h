@@ -4,14 +4,15 @@
 
 namespace ZULMetaData {
 
-/// "text" (text) and "timestamp" (float, seconds) for every slide.
+/// Reads the texts of slides. Each entry has "text" (text) and "timestamp" (float, seconds).
 class SlideInfoTextMetaDataParser final : public KindMetaDataParser<SlideInfoTextKind> {
 public:
     using KindMetaDataParser::KindMetaDataParser;
 
-    /// What the last `read` gave; null before.
+    /// Returns the list of the last `read`, or null before the first one.
     std::shared_ptr<EntryList> slideTextData() const { return entries(); }
-    void setSlideTextData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
+    /// Replaces that list until the next `read`.
+    void setSlideTextData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); }
 };
 
 } // namespace ZULMetaData

@@ -4,14 +4,15 @@
 
 namespace ZULMetaData {
 
-/// "title" (text) and "timestamp" (float, seconds) for every slide.
+/// Reads the titles of slides. Each entry has "title" (text) and "timestamp" (float, seconds).
 class SlideInfoTitleMetaDataParser final : public KindMetaDataParser<SlideInfoTitleKind> {
 public:
     using KindMetaDataParser::KindMetaDataParser;
 
-    /// What the last `read` gave; null before.
+    /// Returns the list of the last `read`, or null before the first one.
     std::shared_ptr<EntryList> slideTitleData() const { return entries(); }
-    void setSlideTitleData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
+    /// Replaces that list until the next `read`.
+    void setSlideTitleData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); }
 };
 
 } // namespace ZULMetaData

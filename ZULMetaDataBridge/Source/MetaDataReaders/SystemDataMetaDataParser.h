@@ -4,15 +4,16 @@
 
 namespace ZULMetaData {
 
-/// "processorCount", "activeProcessorCount", "osVersion", "ram" (texts such as RAM:16384MB, prefix included) and
-/// "timestamp" (float, seconds) for the machine.
+/// Reads the facts about the machine. The entry has "processorCount", "activeProcessorCount", "osVersion", "ram" (texts
+/// with a prefix, such as "RAM:16384MB") and "timestamp" (float, seconds).
 class SystemDataMetaDataParser final : public KindMetaDataParser<SystemDataKind> {
 public:
     using KindMetaDataParser::KindMetaDataParser;
 
-    /// What the last `read` gave; null before.
+    /// Returns the list of the last `read`, or null before the first one.
     std::shared_ptr<EntryList> systemDataMetaData() const { return entries(); }
-    void setSystemDataMetaData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
+    /// Replaces that list until the next `read`.
+    void setSystemDataMetaData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); }
 };
 
 } // namespace ZULMetaData

@@ -4,14 +4,15 @@
 
 namespace ZULMetaData {
 
-/// "name" (text) and "timestamp" (float, seconds) for every application that came to the front.
+/// Reads the applications that came to the front. Each entry has "name" (text) and "timestamp" (float, seconds).
 class TopmostAppNameMetaDataParser final : public KindMetaDataParser<TopmostAppNameKind> {
 public:
     using KindMetaDataParser::KindMetaDataParser;
 
-    /// What the last `read` gave; null before.
+    /// Returns the list of the last `read`, or null before the first one.
     std::shared_ptr<EntryList> appNameData() const { return entries(); }
-    void setAppNameData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
+    /// Replaces that list until the next `read`.
+    void setAppNameData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); }
 };
 
 } // namespace ZULMetaData

@@ -4,14 +4,15 @@
 
 namespace ZULMetaData {
 
-/// "title" (text) and "timestamp" (float, seconds) for every title of the window on top.
+/// Reads the titles of the window on top. Each entry has "title" (text) and "timestamp" (float, seconds).
 class TopmostWindowTitleMetaDataParser final : public KindMetaDataParser<TopmostWindowTitleKind> {
 public:
     using KindMetaDataParser::KindMetaDataParser;
 
-    /// What the last `read` gave; null before.
+    /// Returns the list of the last `read`, or null before the first one.
     std::shared_ptr<EntryList> windowTitleData() const { return entries(); }
-    void setWindowTitleData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); } ///< until `read`
+    /// Replaces that list until the next `read`.
+    void setWindowTitleData(std::shared_ptr<EntryList> list) { setEntries(std::move(list)); }
 };
 
 } // namespace ZULMetaData

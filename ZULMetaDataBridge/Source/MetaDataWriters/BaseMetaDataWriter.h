@@ -1,6 +1,6 @@
 #pragma once
 
-// What every writer of the family shares: the location of its stream file.
+// The base of all writers: the location of the stream file.
 
 #include "../../../Platform/FileLocation.h"
 #include "../../../SharedDependencies/Export.h"
@@ -9,8 +9,9 @@
 
 namespace ZULMetaData {
 
-/// A writer reports nothing by itself. If its file cannot be created or written, the writer drops what it is given. An
-/// application asks `isHealthy` now and then. Used by one thread at a time; separate writers share nothing.
+/// The base class of the writers. A writer does not report errors: if its file cannot be created or written, it drops
+/// its entries. An application should call `isHealthy` now and then. One thread at a time may use a writer; separate
+/// writers share nothing.
 class ZULMETADATA_API BaseMetaDataWriter {
 public:
     BaseMetaDataWriter() = default;
@@ -18,10 +19,10 @@ public:
     BaseMetaDataWriter& operator=(const BaseMetaDataWriter&) = delete;
     virtual ~BaseMetaDataWriter() = default;
 
-    /// Stores the location and runs `setup`, which creates the file. Gives the writer itself.
+    /// Stores the location and calls `setup`, which creates the file. Returns the writer itself.
     BaseMetaDataWriter* initWithMetaDataFile(const FileLocation& file);
 
-    /// Creates the stream writer; does nothing here.
+    /// Creates the stream writer and its file. Does nothing in this class.
     virtual void setup() {}
 
     /// Returns true if the file could be created and every entry since was accepted at a finite time. After an entry
@@ -37,8 +38,8 @@ public:
     /// entries that were still in its buffer, though they are lost.
     virtual std::uint64_t entriesWritten() const { return 0; }
 
-    const FileLocation& metaDataFile() const { return metaDataFile_; }       ///< the last one that was given
-    void setMetaDataFile(const FileLocation& file) { metaDataFile_ = file; } ///< counts from the next `setup` on
+    const FileLocation& metaDataFile() const { return metaDataFile_; }       ///< returns the location of the file
+    void setMetaDataFile(const FileLocation& file) { metaDataFile_ = file; } ///< sets the file for the next `setup`
 
 private:
     FileLocation metaDataFile_;

@@ -4,12 +4,12 @@
 
 namespace ZULMetaData {
 
-/// How busy the machine was, in the unit that the recorder measures.
+/// Writes how busy the machine was, in a unit that the recorder chooses.
 class CPUUsageMetaDataWriter final : public ContinuousMetaDataWriter<CPUUsageKind> {
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
-    void write(float usage, const MediaTime& time) { append(usage, time); } ///< stored as it is
+    void write(float usage, const MediaTime& time) { append(usage, time); } ///< stores `usage` unchanged
 };
 
 } // namespace ZULMetaData

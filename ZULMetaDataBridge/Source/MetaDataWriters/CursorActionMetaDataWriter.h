@@ -6,12 +6,12 @@
 
 namespace ZULMetaData {
 
-/// Buttons pressed and released, with modifiers, as the bits that `HumanReadableActions` names.
+/// Writes the buttons that are pressed and released, and the modifiers, as the bits that `HumanReadableActions` names.
 class CursorActionMetaDataWriter final : public ContinuousMetaDataWriter<CursorActionKind> {
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
-    void write(std::int32_t action, const MediaTime& time) { append(action, time); } ///< bits, stored as they are
+    void write(std::int32_t action, const MediaTime& time) { append(action, time); } ///< stores the bits unchanged
 };
 
 } // namespace ZULMetaData

@@ -8,35 +8,38 @@
 
 namespace ZULMetaData {
 
-/// What the cursor looked like. Images repeat: the application numbers its cursors, writes each image once, and
-/// afterwards only its number. The first entry and every 15th after it are flushed.
+/// Writes what the cursor looks like. Images repeat, so the application gives each image a number, writes the image
+/// once and afterwards only its number. The first entry and every 15th entry after it are flushed.
 class ZULMETADATA_API CursorImageMetaDataWriter final : public KindMetaDataWriter<CursorImageKind> {
 public:
     CursorImageMetaDataWriter() = default;
     explicit CursorImageMetaDataWriter(const FileLocation& file) { initWithMetaDataFile(file); } ///< creates the file
 
-    /// Stores `image` as PNG. One that cannot be encoded leaves an entry without image, hot spot and type.
+    /// Writes `image` as PNG. If it cannot be encoded, the entry has no image, hot spot or type.
     void writeCursorImage(const Image& image, std::int64_t uid, std::int32_t cursorTypeId,
                           std::uint32_t cursorImageFlags, const ScreenPoint& hotSpot, const MediaTime& time);
 
-    /// Writes an image that is encoded already, at a time in seconds. Afterwards `cursor` has no image data any
-    /// more: the bytes, which are not freed, are the caller's.
+    /// Writes an image that is already encoded, at a time in seconds. Afterwards `cursor` has no image data. The bytes
+    /// are not freed; the caller must have kept their address and frees them.
     void writeCursorImage(CursorImage& cursor, double atTimStamp);
 
-    /// The cursor is again the one that was written as `uid` before.
+    /// Writes that the cursor is again the one that was written as `uid` before.
     void writeCursorWithExistingUID(std::int64_t uid, const MediaTime& time);
 
-    void finish() { closeStream(); } ///< closes the file: what is written afterwards is lost
+    void finish() { closeStream(); } ///< closes the file; later entries are lost
 
-    bool shouldFlush() const { return cursorsWritten_ % s_flushInterval == 0; } ///< whether the next entry is flushed
+    bool shouldFlush() const {
+        return cursorsWritten_ % s_flushInterval == 0;
+    } ///< returns whether the next entry is flushed
 
-    /// Images and repetitions, over all files of this writer.
+    /// Returns the number of entries in all files of this writer.
     std::uint32_t cursorsWritten() const { return cursorsWritten_; }
-    void setCursorsWritten(std::uint32_t count) { cursorsWritten_ = count; } ///< 0 makes the next entry a flushed one
+    void setCursorsWritten(std::uint32_t count) { cursorsWritten_ = count; } ///< 0 makes the next entry flush
 
-    /// For the application to keep the last number that it gave; never looked at here.
+    /// Returns a number that the application may keep here, for example the last one that it used. The writer ignores
+    /// it.
     std::int64_t currentUniqueID() const { return currentUniqueID_; }
-    void setCurrentUniqueID(std::int64_t uid) { currentUniqueID_ = uid; } ///< changes nothing that is written
+    void setCurrentUniqueID(std::int64_t uid) { currentUniqueID_ = uid; } ///< has no effect on the file
 
 private:
     std::uint32_t cursorsWritten_ = 0;

@@ -6,17 +6,17 @@
 
 namespace ZULMetaData {
 
-/// Where the cursor was, in pixels of the recorded display. Comes many times a second.
+/// Writes where the cursor is, in pixels of the recorded display, many times a second.
 class CursorLocationMetaDataWriter final : public CountedMetaDataWriter<CursorLocationKind> {
 public:
     using CountedMetaDataWriter::CountedMetaDataWriter;
 
-    /// Fractions are cut off: see `truncated`.
+    /// Stores the position without fractions of pixels; see `truncated`.
     void write(const ScreenPoint& location, const MediaTime& time) { append(truncated(location), time); }
 
-    /// Since the last flush, the flushed one included.
+    /// Returns the number of entries since the last flush, including the entry that was flushed.
     std::uint32_t locationsWritten() const { return written(); }
-    void setLocationsWritten(std::uint32_t count) { setWritten(count); } ///< 0 makes the next entry a flushed one
+    void setLocationsWritten(std::uint32_t count) { setWritten(count); } ///< 0 makes the next entry flush
 };
 
 } // namespace ZULMetaData

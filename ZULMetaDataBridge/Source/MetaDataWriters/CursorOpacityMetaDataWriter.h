@@ -4,12 +4,12 @@
 
 namespace ZULMetaData {
 
-/// How opaque the cursor was drawn, 0 to 1.
+/// Writes how opaque the cursor is drawn, from 0 to 1.
 class CursorOpacityMetaDataWriter final : public ContinuousMetaDataWriter<CursorOpacityKind> {
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
-    /// Stored as it is, also outside of 0 to 1.
+    /// Stores `opacity` unchanged, even if it is not between 0 and 1.
     void write(double opacity, const MediaTime& time) { append(opacity, time); }
 };
 

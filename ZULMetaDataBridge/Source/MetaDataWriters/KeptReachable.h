@@ -4,8 +4,8 @@
 
 namespace ZULMetaData {
 
-/// Remembers an object that is never released, for as long as the program runs, so that leak checkers see it as
-/// in use. Safe to call from several threads.
+/// Keeps a pointer to an object that is never released, so leak checkers see the object as in use. Several threads may
+/// call this at once.
 ZULMETADATA_API void keepReachable(const void* object);
 
 } // namespace ZULMetaData

@@ -6,12 +6,12 @@
 
 namespace ZULMetaData {
 
-/// Keys pressed, as virtual-key codes with the modifier flags that `HumanReadableActions` names.
+/// Writes the keys that are pressed, as virtual-key codes and the modifier flags that `HumanReadableActions` names.
 class KeyboardActionMetaDataWriter final : public ContinuousMetaDataWriter<KeyboardActionKind> {
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
-    /// `eventFlag` has a bit for each modifier that is held down. Both are stored as they are.
+    /// Stores both numbers unchanged. `eventFlag` has one bit for each modifier that is held down.
     void writeCharacterCode(std::uint32_t characterCode, std::uint32_t eventFlag, const MediaTime& time) {
         append(KeyStroke(characterCode, eventFlag), time);
     }

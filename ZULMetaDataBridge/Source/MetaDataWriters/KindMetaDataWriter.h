@@ -1,7 +1,7 @@
 #pragma once
 
-// The mechanism of the writer family: how a stream writer is created and released, and the three ways of writing.
-// A class of the family adds what is peculiar to its kind.
+// How writers write: how a stream writer is created and released, and the three ways of writing entries. The writer of
+// each kind adds what only its kind needs.
 
 #include "../../../SharedDependencies/Export.h"
 #include "../../../ZULMetaData/ZULMMetaDataWriter.h"
@@ -18,14 +18,14 @@
 
 namespace ZULMetaData {
 
-/// What becomes of the stream writer when the writer that made it is destroyed.
+/// Whether a stream writer is released together with the writer that created it.
 enum class StreamWriterRelease { WithWriter, Never };
 
 /// Owns the stream writer of one kind.
 template <class Kind, StreamWriterRelease Release = StreamWriterRelease::WithWriter>
 class ZULMETADATA_API KindMetaDataWriter : public BaseMetaDataWriter {
 public:
-    using StreamWriter = MetaDataWriter<typename Kind::Value, int, int>; ///< what writes the file
+    using StreamWriter = MetaDataWriter<typename Kind::Value, int, int>; ///< the type that writes the file
 
     KindMetaDataWriter() = default;
     ~KindMetaDataWriter() override { release(); }
@@ -48,14 +48,14 @@ public:
     /// \copydoc ZULMetaData::BaseMetaDataWriter::entriesWritten
     std::uint64_t entriesWritten() const override { return entriesWritten_; }
 
-    /// Null before the first `setup`.
+    /// Returns the stream writer, or null before the first `setup`.
     StreamWriter* metaDataWriter() const { return metaDataWriter_; }
 
-    /// Only stores the pointer: what was there before is the caller's now, and `writer` is released with this.
+    /// Stores the pointer. The previous stream writer now belongs to the caller; `writer` is released with this object.
     void setMetaDataWriter(StreamWriter* writer) { metaDataWriter_ = writer; }
 
 protected:
-    /// Without a stream writer the entry is dropped. An entry at a time that is not finite is written as it is.
+    /// Writes an entry, or drops it if there is no stream writer. An entry at a time that is not finite is written too.
     void append(const typename Kind::Value& value, double seconds, bool flush) {
         if (metaDataWriter_)
             metaDataWriter_->write(seconds, value, flush);
@@ -69,19 +69,19 @@ protected:
             ++entriesWritten_;
     }
 
-    /// What is written afterwards is lost.
+    /// Closes the file. Later entries are lost.
     void closeStream() {
         if (metaDataWriter_)
             metaDataWriter_->close();
     }
 
 private:
-    /// <cmath> has this too, at the price of ten thousand lines in every program.
+    /// Does what std::isfinite does. Including <cmath> would add eight thousand lines to every program.
     static bool isFinite(double seconds) {
         return seconds >= std::numeric_limits<double>::lowest() && seconds <= std::numeric_limits<double>::max();
     }
 
-    /// A stream writer's destructor is not virtual: for one that is of exactly this type.
+    /// Destroys a stream writer that is exactly of this type. The destructor of stream writers is not virtual.
     struct Destroyer {
         void operator()(StreamWriter* writer) const {
             writer->StreamWriter::~StreamWriter();
@@ -102,29 +102,29 @@ private:
     bool hasOnlyFiniteTimes_ = true; // since the last `setup`
 };
 
-/// Any number of entries, each flushed unless `setFlushEveryWrite(false)` leaves that to the file buffer.
+/// Writes any number of entries. Each entry is flushed, unless `setFlushEveryWrite(false)` leaves it in the buffer.
 template <class Kind>
 class ZULMETADATA_API ContinuousMetaDataWriter : public KindMetaDataWriter<Kind> {
 public:
-    ContinuousMetaDataWriter() = default; ///< has no file before `initWithMetaDataFile` gives it one
+    ContinuousMetaDataWriter() = default; ///< creates a writer without a file; call `initWithMetaDataFile`
 
     /// Creates the file.
     explicit ContinuousMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); }
 
-    /// Creates the file, and goes back to flushing every write.
+    /// Creates the file and turns `flushEveryWrite` on.
     void setup() override {
         flushEveryWrite_ = true;
         KindMetaDataWriter<Kind>::setup();
     }
 
-    void finish() { this->closeStream(); } ///< closes the file: what is written afterwards is lost
+    void finish() { this->closeStream(); } ///< closes the file; later entries are lost
 
-    /// True from the first `setup` on, unless it was set otherwise.
+    /// Returns whether each entry is flushed. `setup` turns this on.
     bool flushEveryWrite() const { return flushEveryWrite_; }
-    void setFlushEveryWrite(bool flush) { flushEveryWrite_ = flush; } ///< until the next `setup`
+    void setFlushEveryWrite(bool flush) { flushEveryWrite_ = flush; } ///< has effect until the next `setup`
 
 protected:
-    /// Flushes as `flushEveryWrite` says.
+    /// Writes an entry and flushes it if `flushEveryWrite` is on.
     void append(const typename Kind::Value& value, const MediaTime& time) {
         KindMetaDataWriter<Kind>::append(value, time.seconds(), flushEveryWrite_);
     }
@@ -133,32 +133,32 @@ private:
     bool flushEveryWrite_ = false;
 };
 
-/// Texts, stored as they are.
+/// Writes texts, which are stored unchanged.
 template <class Kind>
 class ZULMETADATA_API TextMetaDataWriter : public ContinuousMetaDataWriter<Kind> {
 public:
     using ContinuousMetaDataWriter<Kind>::ContinuousMetaDataWriter;
 
-    /// `utf8` ends with a zero byte. Null is not written.
+    /// Writes `utf8`, which ends with a zero byte. If it is null, nothing is written.
     void write(const char* utf8, const MediaTime& time) {
         if (utf8)
             this->append(utf8, time);
     }
 };
 
-/// Entries between two flushes of the kinds that come many times a second.
+/// The number of entries from one flush to the next, for kinds that are written many times a second.
 inline constexpr std::uint32_t s_flushInterval = 15;
 
-/// Any number of entries, of which the first and every 15th after it are flushed.
+/// Writes any number of entries. The first entry and every 15th entry after it are flushed.
 template <class Kind>
 class ZULMETADATA_API CountedMetaDataWriter : public KindMetaDataWriter<Kind> {
 public:
-    CountedMetaDataWriter() = default; ///< has no file before `initWithMetaDataFile` gives it one
+    CountedMetaDataWriter() = default; ///< creates a writer without a file; call `initWithMetaDataFile`
     explicit CountedMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); } ///< creates the file
 
-    void finish() { this->closeStream(); } ///< closes the file: what is written afterwards is lost
+    void finish() { this->closeStream(); } ///< closes the file; later entries are lost
 
-    /// Asked before an entry is counted. Starts the count anew where it says yes.
+    /// Called before an entry is counted. Returns whether the entry is flushed, and resets the count if it is.
     bool shouldFlush() {
         if (written_ % s_flushInterval != 0)
             return false;
@@ -167,31 +167,32 @@ public:
     }
 
 protected:
-    /// Flushes as `shouldFlush` says, and counts.
+    /// Writes an entry, flushes it if `shouldFlush` returns true, and counts it.
     void append(const typename Kind::Value& value, const MediaTime& time) {
         KindMetaDataWriter<Kind>::append(value, time.seconds(), shouldFlush());
         ++written_;
     }
 
-    std::uint32_t written() const { return written_; } ///< entries since the last flush, the flushed one included
-    void setWritten(std::uint32_t count) { written_ = count; } ///< 0 makes the next entry a flushed one
+    /// Returns the number of entries since the last flush, including the entry that was flushed.
+    std::uint32_t written() const { return written_; }
+    void setWritten(std::uint32_t count) { written_ = count; } ///< 0 makes the next entry flush
 
 private:
     std::uint32_t written_ = 0;
 };
 
-/// One entry at time 0, after which the file is closed and every further one is ignored.
+/// Writes a single entry at time 0 and closes the file. Further entries are ignored.
 template <class Kind, StreamWriterRelease Release>
 class ZULMETADATA_API OneShotMetaDataWriter : public KindMetaDataWriter<Kind, Release> {
 public:
-    OneShotMetaDataWriter() = default; ///< has no file before `initWithMetaDataFile` gives it one
+    OneShotMetaDataWriter() = default; ///< creates a writer without a file; call `initWithMetaDataFile`
     explicit OneShotMetaDataWriter(const FileLocation& file) { this->initWithMetaDataFile(file); } ///< creates the file
 
-    bool hasWritten() const { return hasWritten_; }             ///< also where the entry was lost
-    void setHasWritten(bool written) { hasWritten_ = written; } ///< true makes this ignore its entry
+    bool hasWritten() const { return hasWritten_; }             ///< returns true even if the entry was lost
+    void setHasWritten(bool written) { hasWritten_ = written; } ///< if true, the entry will be ignored
 
 protected:
-    /// Asks for the value where none was written yet, and closes the file behind it.
+    /// Unless an entry was written, calls `makeValue`, writes its result and closes the file.
     template <class MakeValue>
     void writeOnce(MakeValue makeValue) {
         if (hasWritten_)

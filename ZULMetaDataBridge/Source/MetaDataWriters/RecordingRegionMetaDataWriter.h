@@ -4,13 +4,14 @@
 
 namespace ZULMetaData {
 
-/// The region of the display that is recorded, in pixels.
+/// Writes the region of the display that is recorded, in pixels.
 class RecordingRegionMetaDataWriter final
     : public OneShotMetaDataWriter<RecordingRegionKind, StreamWriterRelease::WithWriter> {
 public:
     using OneShotMetaDataWriter::OneShotMetaDataWriter;
 
-    /// Only the first call counts. Fractions are cut off: see `truncated`.
+    /// Writes the only entry, without fractions of pixels (see `truncated`), and closes the file. Later calls have no
+    /// effect.
     void writeAndFinalize(const ScreenRect& region) {
         writeOnce([&] { return truncated(region); });
     }

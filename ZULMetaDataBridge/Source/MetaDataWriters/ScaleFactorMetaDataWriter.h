@@ -6,12 +6,12 @@
 
 namespace ZULMetaData {
 
-/// The scale factor of the recorded display. Its stream writer stays when it goes.
+/// Writes the scale factor of the recorded display. Its stream writer is never released.
 class ScaleFactorMetaDataWriter final : public OneShotMetaDataWriter<ScaleFactorKind, StreamWriterRelease::Never> {
 public:
     using OneShotMetaDataWriter::OneShotMetaDataWriter;
 
-    /// Only the first call counts.
+    /// Writes the only entry and closes the file. Later calls have no effect.
     void writeAndFinalize(std::int32_t scaleFactor) {
         writeOnce([&] { return scaleFactor; });
     }

@@ -4,12 +4,12 @@
 
 namespace ZULMetaData {
 
-/// How far was scrolled, in pixels.
+/// Writes scroll deltas, in pixels.
 class ScrollActionMetaDataWriter final : public ContinuousMetaDataWriter<ScrollActionKind> {
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
-    /// Fractions are cut off: see `truncated`.
+    /// Stores the delta without fractions of pixels; see `truncated`.
     void write(const ScreenPoint& delta, const MediaTime& time) { append(truncated(delta), time); }
 };
 

@@ -4,7 +4,7 @@
 
 namespace ZULMetaData {
 
-/// The presenter's comment on the slide that is shown.
+/// Writes the presenter's comments on the slides that are shown.
 class SlideInfoCommentMetaDataWriter final : public TextMetaDataWriter<SlideInfoCommentKind> {
 public:
     using TextMetaDataWriter::TextMetaDataWriter;

@@ -4,7 +4,7 @@
 
 namespace ZULMetaData {
 
-/// The text of the slide that is shown.
+/// Writes the texts of the slides that are shown.
 class SlideInfoTextMetaDataWriter final : public TextMetaDataWriter<SlideInfoTextKind> {
 public:
     using TextMetaDataWriter::TextMetaDataWriter;

@@ -4,7 +4,7 @@
 
 namespace ZULMetaData {
 
-/// The title of the slide that is shown.
+/// Writes the titles of the slides that are shown.
 class SlideInfoTitleMetaDataWriter final : public TextMetaDataWriter<SlideInfoTitleKind> {
 public:
     using TextMetaDataWriter::TextMetaDataWriter;

@@ -9,18 +9,18 @@
 
 namespace ZULMetaData {
 
-/// The machine that records: processors, operating system and memory. Its stream writer stays when it goes.
+/// Writes the facts about the machine: processors, operating system and memory. Its stream writer is never released.
 class ZULMETADATA_API SystemDataMetaDataWriter final
     : public OneShotMetaDataWriter<SystemDataKind, StreamWriterRelease::Never> {
 public:
     using OneShotMetaDataWriter::OneShotMetaDataWriter;
 
-    /// Asks the system what to write. Only the first call counts.
+    /// Asks the system for the facts, writes the only entry and closes the file. Later calls have no effect.
     void write() {
         writeOnce([] { return systemTexts(ProcessInfo::current()); });
     }
 
-    /// The texts of an entry, which a reader finds by their position.
+    /// Returns the texts of an entry. Readers find each text by its position.
     static std::list<std::string> systemTexts(const ProcessInfo& machine);
 };
 

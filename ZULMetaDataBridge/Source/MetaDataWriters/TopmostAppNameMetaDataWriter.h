@@ -4,7 +4,7 @@
 
 namespace ZULMetaData {
 
-/// The name of the application in front.
+/// Writes the names of the applications that come to the front.
 class TopmostAppNameMetaDataWriter final : public TextMetaDataWriter<TopmostAppNameKind> {
 public:
     using TextMetaDataWriter::TextMetaDataWriter;

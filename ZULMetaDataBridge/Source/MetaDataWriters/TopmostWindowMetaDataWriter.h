@@ -4,12 +4,12 @@
 
 namespace ZULMetaData {
 
-/// Where the window on top was, in pixels.
+/// Writes where the window on top is, in pixels of the display.
 class TopmostWindowMetaDataWriter final : public ContinuousMetaDataWriter<TopmostWindowKind> {
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;
 
-    /// Fractions are cut off: see `truncated`.
+    /// Stores the rectangle without fractions of pixels; see `truncated`.
     void write(const ScreenRect& window, const MediaTime& time) { append(truncated(window), time); }
 };
 

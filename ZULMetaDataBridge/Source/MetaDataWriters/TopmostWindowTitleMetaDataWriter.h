@@ -4,7 +4,7 @@
 
 namespace ZULMetaData {
 
-/// The title of the window on top.
+/// Writes the titles of the window on top.
 class TopmostWindowTitleMetaDataWriter final : public TextMetaDataWriter<TopmostWindowTitleKind> {
 public:
     using TextMetaDataWriter::TextMetaDataWriter;
