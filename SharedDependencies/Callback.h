@@ -15,7 +15,7 @@ class Callback;
 /// Holds a function: a lambda, a pointer to a function, a `std::function` or any other object that can be called with
 /// `Arguments` and returns a `Result`. An empty callback must not be called. Copies share what they hold.
 ///
-/// Public headers use this instead of `std::function`, because <functional> would make them twice as long.
+/// Public headers use this instead of `std::function`, because `<functional>` would make them twice as long.
 template <class Result, class... Arguments>
 class Callback<Result(Arguments...)> {
 public:

@@ -1,6 +1,6 @@
 #pragma once
 
-// Everything that an application records and reads with.
+// Includes everything with which an application records and reads.
 
 #include "../Platform/FileLocation.h"
 #include "../Platform/Image.h"

@@ -1,6 +1,6 @@
 #pragma once
 
-// Turns decoded values into entries, by the fields of their kind.
+// Converts decoded values into entries, along the fields of their kind.
 
 #include "../../SharedDependencies/Export.h"
 #include "EntryDictionary.h"
@@ -14,7 +14,8 @@
 
 namespace ZULMetaData {
 
-/// A value as an entry holds it: unsigned integers keep their bits, reals are narrowed to 32 bits.
+/// Each returns the value in the form in which an entry holds it. Unsigned integers keep their bits; floating-point
+/// numbers are narrowed to 32 bits.
 ///@{
 ZULMETADATA_API EntryValue entryValue(std::int32_t value);
 ZULMETADATA_API EntryValue entryValue(std::uint32_t value);
@@ -25,13 +26,13 @@ ZULMETADATA_API EntryValue entryValue(std::string value);
 ZULMETADATA_API EntryValue entryValue(EntryValue value);
 ///@}
 
-/// A field whose value is a number of 32 bits, or becomes one.
+/// A type whose values are stored in an entry as numbers of 32 bits.
 template <class Value>
 concept NumberField = OneOf < std::remove_cvref_t<Value>,
         std::int32_t, std::uint32_t,
 float, double > ;
 
-/// The same for a number that the entry keeps inline.
+/// Returns the number in the form in which an entry of numbers holds it.
 template <NumberField Value>
 EntryNumber entryNumber(Value value) {
     if constexpr (std::integral<Value>)
@@ -40,7 +41,7 @@ EntryNumber entryNumber(Value value) {
         return static_cast<float>(value);
 }
 
-/// The keys of a kind's fields, then "timestamp".
+/// Returns the keys of the fields of a kind, followed by "timestamp".
 template <class Kind>
 const EntryKeys& entryKeys() {
     static const EntryKeys& keys = *new EntryKeys(std::apply( // never destroyed: entries may outlive the program's end
@@ -51,7 +52,8 @@ const EntryKeys& entryKeys() {
     return keys;
 }
 
-/// `time` is narrowed to 32 bits. Throws what the kind's fields throw for a value that has no text.
+/// Returns the entry of a value. `time` is narrowed to 32 bits. Exceptions of the kind's fields pass through; they
+/// throw for a value that has no valid text.
 template <class Kind>
 EntryDictionary makeEntry(double time, const typename Kind::Value& value) {
     static_assert(std::tuple_size_v<decltype(Kind::fields)> < EntryDictionary::maxSize);

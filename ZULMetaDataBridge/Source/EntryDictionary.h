@@ -1,6 +1,6 @@
 #pragma once
 
-// What a parser gives to the application: entries as lists of named values.
+// The entries that parsers return: small maps of named values.
 //
 //     for (const EntryDictionary& entry : *parser.read())
 //         std::cout << entry.get<std::int32_t>("x") << " at " << entry.get<float>("timestamp") << '\n';
@@ -24,71 +24,74 @@ namespace ZULMetaData {
 
 class Image;
 
-/// What an entry holds under one key; each parser says of which types the values of its keys are.
+/// A value in an entry. Each parser documents the types of its values.
 using EntryValue = std::variant<std::int32_t, std::int64_t, float, std::string, std::shared_ptr<const Image>>;
 
-/// Whether an `EntryValue` can hold a `T`.
+/// Is true if an `EntryValue` can hold a `T`.
 template <class T>
 inline constexpr bool isEntryValueType =
     std::is_same_v<T, std::int32_t> || std::is_same_v<T, std::int64_t> || std::is_same_v<T, float> ||
     std::is_same_v<T, std::string> || std::is_same_v<T, std::shared_ptr<const Image>>;
 
-/// What most kinds of entry consist of. A fifth of the size of an `EntryValue`.
+/// A number in an entry. Most entries have only numbers. It takes a fifth of the memory of an `EntryValue`.
 using EntryNumber = std::variant<std::int32_t, float>;
 
-/// The keys of one kind of entry, in the order of its values.
+/// The keys of the entries of one kind, in the order of their values.
 using EntryKeys = std::vector<std::string>;
 
-/// One decoded entry: a small map whose order is that of its kind's keys. Constant entries may be read by several
-/// threads.
+/// A decoded entry: a small map in the order of the keys of its kind. Several threads may read the same constant entry.
 ///
-/// Hours of recording make millions of entries, nearly all of them numbers: those are kept inline, 56 bytes in all, and
-/// become `EntryValue`s only where somebody asks for one.
+/// A recording of some hours has millions of entries, and nearly all of them have only numbers. Such an entry keeps its
+/// numbers in the object itself, 56 bytes in all. They become `EntryValue`s when one is asked for.
 class ZULMETADATA_API EntryDictionary {
 public:
-    static constexpr std::size_t maxSize = 5; ///< keys of an entry, "timestamp" included
+    static constexpr std::size_t maxSize = 5; ///< the largest number of keys, "timestamp" included
 
-    /// In the order of the keys; what is left over behind them is unused.
+    /// Values in the order of the keys. The rest of the array is not used.
     using Values = std::array<EntryValue, maxSize>;
-    using Numbers = std::array<EntryNumber, maxSize>;                    ///< likewise
-    using value_type = std::pair<const std::string&, const EntryValue&>; ///< key and value, valid as long as the entry
+    /// Numbers in the order of the keys. The rest of the array is not used.
+    using Numbers = std::array<EntryNumber, maxSize>;
+    using value_type =
+        std::pair<const std::string&, const EntryValue&>; ///< a key and its value, valid as long as the entry
     class const_iterator;
 
-    /// `keys` must outlive the entry; `values` are its values in the same order, at most `maxSize`.
+    /// Creates an entry of these values, which are in the order of `keys`. `keys` must outlive the entry.
     EntryDictionary(const EntryKeys& keys, Values values);
 
-    /// The same for an entry of numbers alone; allocates nothing.
+    /// Returns an entry that has only numbers. Allocates no memory.
     static EntryDictionary ofNumbers(const EntryKeys& keys, const Numbers& numbers) noexcept {
         EntryDictionary entry(keys);
         entry.numbers_ = numbers;
         return entry;
     }
 
-    EntryDictionary(const EntryDictionary& other); ///< shares the keys
+    EntryDictionary(const EntryDictionary& other); ///< copies the values and refers to the same keys
 
-    /// Leaves `other` with its keys, whose values then mean nothing.
+    /// Takes the values. `other` keeps its keys, but its values mean nothing afterwards.
     EntryDictionary(EntryDictionary&& other) noexcept
         : keys_(other.keys_), numbers_(other.numbers_), values_(other.values_.load(std::memory_order_relaxed)) {
         other.values_.store(nullptr, std::memory_order_relaxed);
     }
-    EntryDictionary& operator=(EntryDictionary other) noexcept; ///< copies or moves, as `other` was made
+    EntryDictionary& operator=(EntryDictionary other) noexcept; ///< assigns by copy or by move
     ~EntryDictionary() {
         if (values_.load(std::memory_order_relaxed))
             deleteValues();
     }
 
-    /// Throws `std::out_of_range` for a key that the entry lacks. Valid as long as the entry.
+    /// Returns the value of the key, which is valid as long as the entry. Throws `std::out_of_range` if the entry does
+    /// not have the key.
     const EntryValue& at(std::string_view key) const;
 
-    /// Throws as `at` does, and `std::bad_variant_access` where the value is of another type.
+    /// Returns the value of the key as a `T`, one of the types of `EntryValue`. Throws `std::out_of_range` if the entry
+    /// does not have the key, and `std::bad_variant_access` if the value has another type.
     template <class T>
     T get(std::string_view key) const;
 
-    const_iterator find(std::string_view key) const;   ///< `end()` where the entry lacks the key
-    bool contains(std::string_view key) const;         ///< the same for every entry of a kind
-    std::size_t size() const { return keys_->size(); } ///< "timestamp" included
-    const_iterator begin() const;                      ///< at the kind's first key
-    const_iterator end() const;                        ///< behind "timestamp"
+    const_iterator find(std::string_view key) const;   ///< returns `end()` if the entry does not have the key
+    bool contains(std::string_view key) const;         ///< returns whether the entry has the key
+    std::size_t size() const { return keys_->size(); } ///< returns the number of keys, "timestamp" included
+    const_iterator begin() const;                      ///< returns an iterator to the first key
+    const_iterator end() const;                        ///< returns the iterator after "timestamp"
 
 private:
     explicit EntryDictionary(const EntryKeys& keys) noexcept : keys_(&keys) {}
@@ -101,17 +104,17 @@ private:
     void deleteValues() noexcept;
 
     const EntryKeys* keys_;
-    Numbers numbers_{};                                   // where there are no values
+    Numbers numbers_{};                                   // used if there are no values
     mutable std::atomic<const Values*> values_ = nullptr; // owned
 };
 
-/// What `read` of a parser gives: the entries of a stream, in its order.
+/// The entries of a stream, in its order. Parsers return such lists.
 using EntryList = std::vector<EntryDictionary>;
 
-/// Gives pairs of key and value.
+/// Iterates over the pairs of key and value.
 class EntryDictionary::const_iterator {
 public:
-    /// What algorithms ask of an iterator that makes its pairs as it goes.
+    /// The types that algorithms need from an iterator.
     ///@{
     using iterator_category = std::input_iterator_tag;
     using value_type = EntryDictionary::value_type;
@@ -119,18 +122,20 @@ public:
     using reference = value_type;
     ///@}
 
-    /// Keeps the pair that `->` gives access to.
+    /// Holds a pair for `operator->`.
     struct pointer {
-        value_type pair;                                       ///< refers into the entry
-        const value_type* operator->() const { return &pair; } ///< valid as long as the pair
+        value_type pair; ///< the pair, which refers into the entry
+        const value_type* operator->() const {
+            return &pair;
+        } ///< returns a pointer that is valid as long as this object
     };
 
     const_iterator() = default;
 
-    /// At the key of number `index`, counted from 0.
+    /// Creates an iterator to the key at `index`, counted from 0.
     const_iterator(const EntryDictionary& entry, std::size_t index) : entry_(&entry), index_(index) {}
 
-    /// As of any input iterator. What they give refers into the entry.
+    /// The operations of an input iterator. Their results refer into the entry.
     ///@{
     reference operator*() const { return entry_->pairAt(index_); }
     pointer operator->() const { return {**this}; }

@@ -1,6 +1,6 @@
 #pragma once
 
-// Texts for recorded input actions, such as "left down + shift" or "<Shift><Cmd>".
+// Texts for recorded actions, such as "left down + shift" or "<Shift><Cmd>".
 
 #include "../../SharedDependencies/Export.h"
 
@@ -8,20 +8,21 @@
 
 namespace ZULMetaData {
 
-/// The words for actions and keys that recorders number.
+/// Returns the texts for the numbers of actions and keys.
 struct ZULMETADATA_API HumanReadableActions {
-    /// Whether every bit of `flag` is set. Throws `std::invalid_argument` "Flag should not be empty." for 0.
+    /// Returns whether all bits of `flag` are set in `value`. Throws `std::invalid_argument` "Flag should not be
+    /// empty." if `flag` is 0.
     static bool HasFlag(int value, int flag);
 
-    /// "left down", "right up + cmd" and so on. Bits 16 and 32 mean the middle button where no left or right
-    /// bit is set, and Shift and Control otherwise. Without a button: the number.
+    /// Returns a text such as "left down" or "right up + cmd". Bits 16 and 32 mean the middle button if no bit of the
+    /// left or right button is set, and Shift and Control otherwise. If there is no button, the text is the number.
     static std::string CursorActionToString(int action);
 
-    /// The name of a virtual-key code. A code without one gives the character of its low 8 bits as it is, which
-    /// need not be UTF-8, or nothing for white space.
+    /// Returns the name of a virtual-key code. For a code without a name, returns the low 8 bits as a single byte,
+    /// which may be invalid UTF-8, or an empty text if that byte is white space.
     static std::string KeyboardActionCodeToString(int code);
 
-    /// "<Shift><Cmd>" and so on; "NONE" where no known bit is set.
+    /// Returns a text such as "<Shift><Cmd>", or "NONE" if no known bit is set.
     static std::string KeyboardModifiersToString(int flags);
 };
 

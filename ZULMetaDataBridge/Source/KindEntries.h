@@ -1,6 +1,6 @@
 #pragma once
 
-// What the kind of a stream tells about its entries, for code that handles streams of any kind.
+// Properties of entries that depend on the kind of their stream, for code that handles streams of any kind.
 
 #include "../../SharedDependencies/Export.h"
 #include "../../ZULMetaData/StreamEntries.h"
@@ -12,17 +12,17 @@
 
 namespace ZULMetaData {
 
-/// Whether the stream is of a kind and version whose entries can be decoded here.
+/// Returns whether entries of this kind and version can be decoded.
 ZULMETADATA_API bool isDecodable(const MetaDataHeader& header);
 
-/// Bytes of each of its entries, 0 where they vary: what readers of its kind go by, whatever the header says. Of a
-/// stream that cannot be decoded, what the header says.
+/// Returns the size of every entry in bytes, or 0 if each entry has its own size. Readers use the size that the kind
+/// determines, whatever the header says; only if the stream cannot be decoded, the size is the one in the header.
 ZULMETADATA_API std::uint32_t entrySizeOf(const MetaDataHeader& header);
 
-/// Entries as readers of the stream's kind tell them apart.
+/// Returns the entries of a stream, divided as readers of its kind divide them.
 ZULMETADATA_API StreamEntries entriesOf(ReadBytes read, std::uint64_t length);
 
-/// None where the entry does not fit its kind, and where the stream cannot be decoded.
+/// Returns the time of an entry in seconds. It is empty if the entry does not fit its kind or cannot be decoded.
 ZULMETADATA_API std::optional<double> timeOfEntry(const MetaDataHeader& header, std::string_view bytes);
 
 } // namespace ZULMetaData

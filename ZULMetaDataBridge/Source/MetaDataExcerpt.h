@@ -7,9 +7,10 @@
 
 namespace ZULMetaData {
 
-/// A small file that holds the metadata of `recording`, every byte of it, and none of its pictures and sound: readers
-/// find the same streams and recording information in it, at other offsets. It is a container of the same type, to be
-/// named with the same extension; of a bare stream, all of it. Throws `std::system_error` where reading fails.
+/// Returns a small file that has all the metadata of `recording`, byte for byte, but none of its pictures and sound.
+/// Readers find the same streams and recording info in it, at other offsets. The file is a container of the same type
+/// and should have the same extension. For a bare stream, the result is the whole stream. Throws `std::system_error` if
+/// reading fails.
 ZULMETADATA_API std::string metaDataExcerpt(MetaDataParser& recording);
 
 } // namespace ZULMetaData

@@ -1,7 +1,7 @@
 #pragma once
 
-// What is peculiar to each kind of metadata that the application records and reads: the value its entries hold,
-// the identifier and version of its stream, and the keys under which its entries are read back.
+// The kinds of metadata that applications record and read. Each kind has the type of its values, the identifier and the
+// version of its stream, and the keys of its entries.
 
 #include "../../SharedDependencies/Export.h"
 #include "../../ZULMetaData/ZULMMetaDataCommon.h"
@@ -20,17 +20,17 @@
 
 namespace ZULMetaData {
 
-/// One key of an entry, and how its value is taken from what the stream holds.
+/// One key of an entry, and how its value is computed from the value in the stream.
 template <class Projection>
 struct Field {
-    const char* key;    ///< under which entries hold it
-    Projection valueOf; ///< a member of the kind's value, or a function of it; gives what `entryValue` takes
+    const char* key;    ///< the key in entries
+    Projection valueOf; ///< a member of the kind's value, or a function of it, whose result `entryValue` accepts
 
-    /// Deduces the projection's type.
+    /// Creates the field and deduces the type of its projection.
     constexpr Field(const char* fieldKey, Projection projection) : key(fieldKey), valueOf(projection) {}
 };
 
-/// Returns what `field` takes from `value`: a member, or the result of a function.
+/// Returns the value of a field: a member of `value`, or the result of a function of it.
 template <class Projection, class Value>
 constexpr decltype(auto) valueOfField(const Field<Projection>& field, const Value& value) {
     if constexpr (std::is_member_object_pointer_v<Projection>)
@@ -39,21 +39,22 @@ constexpr decltype(auto) valueOfField(const Field<Projection>& field, const Valu
         return field.valueOf(value);
 }
 
-/// The projection of a kind whose value is a single number.
+/// The projection for a kind whose value is a single number.
 inline constexpr auto wholeValue = [](const auto& value) { return value; };
 
-inline constexpr std::tuple s_pointFields{Field{"x", &Point::x}, Field{"y", &Point::y}}; ///< of every kind of points
+inline constexpr std::tuple s_pointFields{Field{"x", &Point::x},
+                                          Field{"y", &Point::y}}; ///< the fields of all kinds of points
 
-/// Of every kind of rectangles.
+/// The fields of all kinds of rectangles.
 inline constexpr std::tuple s_rectFields{Field{"x", &Rect::x}, Field{"y", &Rect::y}, Field{"width", &Rect::width},
                                          Field{"height", &Rect::height}};
 
 /// Where the window on top was.
 struct TopmostWindowKind {
-    using Value = Rect;                               ///< what an entry holds beside its time
-    static constexpr uuid type = s_topmostWindowUUID; ///< in the header of the stream
-    static constexpr int version = 1;                 ///< that is written, and read with all before it
-    static constexpr auto fields = s_rectFields;      ///< the keys of its entries; "timestamp" follows them
+    using Value = Rect;                               ///< the type of the values in the stream
+    static constexpr uuid type = s_topmostWindowUUID; ///< the identifier in the header of the stream
+    static constexpr int version = 1;                 ///< the version that is written; earlier ones are read too
+    static constexpr auto fields = s_rectFields;      ///< the keys of its entries, which "timestamp" follows
 };
 
 /// What the cursor hovered over.
@@ -152,7 +153,7 @@ struct TopmostAppNameKind {
     static constexpr std::tuple fields{Field{"name", textFromUTF8}};
 };
 
-/// The image that an entry carries, or the text "nil" where it has none or one that cannot be decoded.
+/// Returns the image of an entry, or the text "nil" if the entry has no image or one that cannot be decoded.
 ZULMETADATA_API EntryValue entryImage(const CursorImage& cursor);
 
 /// What the cursor looked like.
@@ -174,12 +175,12 @@ struct CursorActionKind {
                                        Field{"rawActionValue", wholeValue}};
 };
 
-/// "characterString" of an entry, by `HumanReadableActions::KeyboardActionCodeToString`.
+/// Returns the "characterString" of an entry, from `HumanReadableActions::KeyboardActionCodeToString`.
 inline std::string keyText(const KeyStroke& key) {
     return HumanReadableActions::KeyboardActionCodeToString(static_cast<std::int32_t>(key.characterCode));
 }
 
-/// "eventFlagsString" of an entry, by `HumanReadableActions::KeyboardModifiersToString`.
+/// Returns the "eventFlagsString" of an entry, from `HumanReadableActions::KeyboardModifiersToString`.
 inline std::string keyModifiersText(const KeyStroke& key) {
     return HumanReadableActions::KeyboardModifiersToString(static_cast<std::int32_t>(key.eventFlagsCode));
 }
@@ -194,7 +195,7 @@ struct KeyboardActionKind {
         Field{"eventFlagsCode", &KeyStroke::eventFlagsCode}, Field{"eventFlagsString", keyModifiersText}};
 };
 
-/// Throws `std::out_of_range` where an entry holds too few texts.
+/// Returns one of the texts of an entry. Throws `std::out_of_range` if the entry has fewer texts.
 template <std::size_t Position>
 std::string systemText(const std::list<std::string>& texts) {
     if (texts.size() <= Position)
@@ -212,10 +213,10 @@ struct SystemDataKind {
                                        Field{"ram", systemText<3>}};
 };
 
-/// Kinds as a type, so that code can be made for each of them.
+/// A list of kinds as a type, for code that is generated for each kind.
 template <class... Kinds>
 struct KindList {
-    static constexpr std::size_t size = sizeof...(Kinds); ///< kinds in the list
+    static constexpr std::size_t size = sizeof...(Kinds); ///< the number of kinds
 
     /// Calls `visit.template operator()<Kind>()` for every kind.
     template <class Visit>
@@ -223,14 +224,15 @@ struct KindList {
         (visit.template operator()<Kinds>(), ...);
     }
 
-    /// The same for the kind of `type` alone. False where it is not in the list.
+    /// Calls `visitor.template operator()<Kind>()` for the kind with the identifier `type`. Returns false if the list
+    /// does not have it.
     template <class Visit>
     static constexpr bool visit(const uuid& type, Visit&& visitor) {
         return ((Kinds::type == type ? (visitor.template operator()<Kinds>(), true) : false) || ...);
     }
 };
 
-/// Every kind that has a writer and a parser, in the order of the registry.
+/// All kinds that have a writer and a parser, in the order of the registry.
 using RecordedKinds =
     KindList<CursorActionKind, CursorImageKind, CursorLocationKind, CursorOpacityKind, KeyboardActionKind,
              RecordingRegionKind, TopmostWindowKind, SlideInfoTitleKind, SlideInfoTextKind, SlideInfoCommentKind,

@@ -1,8 +1,8 @@
 #pragma once
 
-// Finds metadata streams that a walk of the container cannot reach: behind a broken or mis-sized atom, in a file that
-// was cut short, or without any container around them. The bytes of the file are searched for the headers of streams;
-// what follows one is measured entry by entry.
+// Finds metadata streams that a walk along the container cannot reach: after a broken atom or one with a wrong size, in
+// a file that was cut short, or without any container. All bytes of the file are searched for headers of streams, and
+// what follows a header is measured entry by entry.
 //
 //     StreamSalvage salvage(file, MetaDataParser::QuickTime);
 //     for (const SalvagedStream& stream : salvage.run().streams)
@@ -22,53 +22,55 @@
 
 namespace ZULMetaData {
 
-/// A stream that was found, and how much of it is whole.
+/// A stream that was found.
 struct SalvagedStream {
-    /// How it was found, from the best to the worst.
+    /// How a stream was found, from the best way to the worst.
     enum Origin : std::int32_t {
-        Reachable,   ///< a walk of the container gets to it
-        Unreachable, ///< in a DATA atom or chunk that the walk does not get to
-        Bare,        ///< only the stream's own header was found
+        Reachable,   ///< a walk along the container reaches it
+        Unreachable, ///< it is in a DATA atom or chunk that the walk does not reach
+        Bare,        ///< only the header of the stream was found
     };
 
-    MetaDataHeader header;                      ///< as it stands in the file
+    MetaDataHeader header;                      ///< the header as it is stored
     Origin origin = Bare;                       ///< how it was found
-    std::uint64_t offset = 0;                   ///< of its header in the file
-    std::uint64_t bytes = 0;                    ///< header and whole entries
-    std::uint64_t entries = 0;                  ///< whole ones
-    std::optional<std::uint64_t> declaredBytes; ///< by the DATA around it
+    std::uint64_t offset = 0;                   ///< the position of the header in the file
+    std::uint64_t bytes = 0;                    ///< the size of the header and the whole entries
+    std::uint64_t entries = 0;                  ///< the number of whole entries
+    std::optional<std::uint64_t> declaredBytes; ///< the size that the DATA around it declares
 
-    /// Whether something of what is declared, or of the entry behind the last whole one, is lost.
+    /// Is true if declared bytes are missing, or a part of the entry after the last whole one.
     bool isCutShort = false;
 
-    std::uint64_t end() const { return offset + bytes; } ///< behind the last whole entry, in the file
+    std::uint64_t end() const { return offset + bytes; } ///< returns the position after the last whole entry
 };
 
-/// What was found.
+/// The result of a search.
 struct SalvageReport {
-    /// More are not looked for: a file full of headers must not fill the memory.
+    /// The search ends at this number of streams, because a file full of headers must not fill the memory.
     static constexpr std::size_t s_maximumStreams = 10000;
 
-    std::vector<SalvagedStream> streams; ///< in the order of their kinds, of each kind the best first
-    bool hasMore = false;                ///< whether what may be headers of further streams was passed over
+    std::vector<SalvagedStream> streams; ///< sorted by kind; the best stream of a kind is first
+    bool hasMore = false;                ///< is true if there may be more streams
 };
 
-/// A stream counts where its kind is registered, its version is known, the size of its entries is that of its kind,
-/// and its first entry makes sense: it is whole, fits its kind and has a time that a recording can have. Streams that
-/// the walk reaches count whatever they are. What looks like a header inside a whole entry is part of that entry.
+/// Searches a file for streams. A stream is accepted if its kind is registered, its version is known, its entries have
+/// the size of its kind, and its first entry is plausible: it is whole, fits the kind and has a time that a recording
+/// can have. Streams that a walk along the container reaches are always accepted. Bytes inside a whole entry that look
+/// like a header are part of that entry.
 ///
-/// Every stream ends at the latest where the next one begins; one without a declared length also at the first entry
-/// whose time makes no sense.
+/// A stream ends where the next stream begins, if not before. A stream without a declared length also ends before the
+/// first entry whose time is not plausible.
 class ZULMETADATA_API StreamSalvage {
 public:
-    /// Called now and then with how many bytes have been searched.
+    /// Called from time to time with the number of bytes that have been searched.
     using Progress = Callback<void(std::uint64_t done)>;
 
-    /// `file` is the caller's and must outlive this. Of the type `Unknown` or `RawStream` nothing is walked, but what a
-    /// bare stream file begins with is reachable. Throws `std::system_error` where the file has no size.
+    /// `file` must outlive this object. If `type` is `Unknown` or `RawStream`, there is no container to walk along; a
+    /// stream at the beginning of a bare stream file is reachable. Throws `std::system_error` if the size of the file
+    /// cannot be determined.
     StreamSalvage(std::istream& file, MetaDataParser::StreamType type, Progress progress = {});
 
-    /// Searches the whole file, in a few megabytes of memory. Throws `std::system_error` where it cannot be read.
+    /// Searches the whole file with a few megabytes of memory. Throws `std::system_error` if the file cannot be read.
     SalvageReport run();
 
 private:

@@ -5,10 +5,10 @@
 
 namespace ZULMetaData {
 
-/// Mends a movie as recorders always have; `SafeMovieSave::repair` is the safe way.
+/// Repairs a movie in the way that recorders rely on. New code should use `SafeMovieSave::repair`, which is safe.
 class ZULMETADATA_API ZULMAtomRepair {
 public:
-    /// Gives the last atom of a movie that was cut short its real size; see `Util::finalizeAtomsInFile`.
+    /// Sets the size of the last atom in a movie that was not finished; see `Util::finalizeAtomsInFile`.
     static bool finalizeAtomsInFile(const FileLocation& file);
 };
 

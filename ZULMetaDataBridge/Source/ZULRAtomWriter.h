@@ -8,19 +8,19 @@
 
 namespace ZULMetaData {
 
-/// Stamps a movie as recorders always have; `SafeMovieSave::stamp` is the safe way.
+/// Stamps a movie in the way that recorders rely on. New code should use `SafeMovieSave::stamp`, which is safe.
 class ZULMETADATA_API ZULRAtomWriter {
 public:
-    /// Repairs the movie's last atom and appends a `ZULR` atom of 80 bytes: the header, then a `ZCAPHeader` of
-    /// version 1. Every call appends another one.
+    /// Repairs the last atom of the movie and appends a `ZULR` atom of 80 bytes: its header, then a `ZCAPHeader` of
+    /// version 1. Every call appends another atom.
     ///
-    /// The stored creator's name is always the platform's, in place of `creatorName`: readers tell platforms apart
-    /// by it. A movie that cannot be opened ends the process through the platform's assertion report.
+    /// `creatorName` is not stored: the name is always that of the platform, by which readers tell platforms apart. If
+    /// the movie cannot be opened, the process ends through the platform's assertion report.
     void writeZULRtoFile(const FileLocation& file, const std::string& creatorName,
                          const std::string& creatorVersion) const;
 };
 
-/// What `writeZULRtoFile` stores, for the system that this program runs on.
+/// Returns the record that `writeZULRtoFile` stores on this system.
 ZULMETADATA_API ZCAPHeader recordingInfo(const std::string& creatorName, const std::string& creatorVersion);
 
 } // namespace ZULMetaData

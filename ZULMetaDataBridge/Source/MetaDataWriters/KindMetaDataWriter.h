@@ -76,7 +76,7 @@ protected:
     }
 
 private:
-    /// Does what std::isfinite does. Including <cmath> would add eight thousand lines to every program.
+    /// Does what std::isfinite does. Including `<cmath>` would add eight thousand lines to every program.
     static bool isFinite(double seconds) {
         return seconds >= std::numeric_limits<double>::lowest() && seconds <= std::numeric_limits<double>::max();
     }
