@@ -1,10 +1,11 @@
-zulm_add_test(Bindings/CInterfaceTest)
-target_link_libraries(Bindings.CInterfaceTest PRIVATE zulmetadata_c ZULMetaDataToolTestSupport ZULMetaDataInvalidCorpus)
+zulm_add_tests(BindingsTests
+  CInterfaceTest
+  SliceBufferTest)
+target_link_libraries(BindingsTests PRIVATE zulmetadata_c ZULMetaDataToolTestSupport ZULMetaDataInvalidCorpus)
+add_dependencies(BindingsTests zulm)
 add_test(NAME Bindings/HeaderIsC
   COMMAND ${CMAKE_CXX_COMPILER} -x c -std=c99 -pedantic -Wall -Wextra -Werror -fsyntax-only
     ${PROJECT_SOURCE_DIR}/Bindings/JavaScript/zulmetadata_c.h)
-zulm_add_test(Bindings/SliceBufferTest)
-target_link_libraries(Bindings.SliceBufferTest PRIVATE zulmetadata_c)
 
 # The module for JavaScript, where it is built.
 if(ZULM_VIEWER)

@@ -1,15 +1,24 @@
 find_package(TIFF REQUIRED)
 
-zulm_add_test(Platform/AssertionReportTest)
-zulm_add_test(Platform/FileLocationTest)
-zulm_add_test(Platform/FileSystemTest)
+# Some of these run other programs, which are ImageMagick's convert and pngcheck.
+zulm_add_tests(PlatformTests
+  AssertionReportTest
+  DurableFileTest
+  EncodedImageInfoTest
+  FileLocationTest
+  FileSystemTest
+  ImageTest
+  PNGDecodeTest
+  ProcessInfoTest
+  TIFFDecodeTest)
+target_sources(PlatformTests PRIVATE Platform/ImageTestSupport.cpp)
+target_link_libraries(PlatformTests PRIVATE TIFF::TIFF)
 
-# These run other programs: those of images ImageMagick's convert and pngcheck.
-foreach(test IN ITEMS ImageStructureTest ImageTest PNGDecodeTest ProcessInfoTest TIFFDecodeTest)
-  zulm_add_test(Platform/${test})
-  target_sources(Platform.${test} PRIVATE Platform/ImageTestSupport.cpp)
-  target_link_libraries(Platform.${test} PRIVATE TIFF::TIFF)
-endforeach()
-target_sources(Platform.ImageStructureTest PRIVATE
+# What takes the place of the codecs in a build without them.
+zulm_add_tests(PlatformStructureTests
+  ImageStructureTest)
+target_sources(PlatformStructureTests PRIVATE
+  Platform/ImageTestSupport.cpp
   ${PROJECT_SOURCE_DIR}/Platform/PNGStructure.cpp
   ${PROJECT_SOURCE_DIR}/Platform/TIFFStructure.cpp)
+target_link_libraries(PlatformStructureTests PRIVATE TIFF::TIFF)

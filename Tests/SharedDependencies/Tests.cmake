@@ -1,4 +1,5 @@
-zulm_add_test(SharedDependencies/CallbackTest)
-zulm_add_test(SharedDependencies/CreatorAttributesTest)
-zulm_add_test(SharedDependencies/EndianFileTest)
-zulm_add_test(SharedDependencies/ZCAPHeaderTest)
+zulm_add_tests(SharedDependenciesTests
+  CallbackTest
+  CreatorAttributesTest
+  EndianFileTest
+  ZCAPHeaderTest)

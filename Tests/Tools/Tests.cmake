@@ -14,32 +14,36 @@ target_compile_definitions(ZULMetaDataToolTestSupport PRIVATE
   ZULM_PATH="${ZULM_PATH}" ZULM_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/Data")
 zulm_project_options(ZULMetaDataToolTestSupport)
 
-# zulm_add_tool_test(PATH): as zulm_add_test, for a test that runs the tool. ZULM_PATH is what the tool is started by.
-function(zulm_add_tool_test path)
-  zulm_add_test(${path})
-  string(REPLACE "/" "." name ${path})
-  target_link_libraries(${name} PRIVATE ZULMetaDataToolTestSupport)
-  target_compile_definitions(${name} PRIVATE ZULM_PATH="${ZULM_PATH}")
-  add_dependencies(${name} zulm)
-endfunction()
-
-zulm_add_tool_test(Tools/AtomsCommandTest)
-zulm_add_tool_test(Tools/CommandLineTest)
-zulm_add_tool_test(Tools/DemoCommandTest)
-zulm_add_tool_test(Tools/DumpCommandTest)
-zulm_add_tool_test(Tools/InfoCommandTest)
-zulm_add_tool_test(Tools/ManualTest)
-target_compile_definitions(Tools.ManualTest PRIVATE ZULM_DOCS="${PROJECT_SOURCE_DIR}/Docs")
-zulm_add_test(Tools/NumberTest)
-target_link_libraries(Tools.NumberTest PRIVATE zulm_reports)
-zulm_add_test(Tools/OutOfMemoryTest)
-target_link_libraries(Tools.OutOfMemoryTest PRIVATE zulm_commands)
-zulm_add_tool_test(Tools/OutputFileTest)
-target_link_libraries(Tools.OutputFileTest PRIVATE zulm_commands)
-zulm_add_tool_test(Tools/SchemaTest)
-target_compile_definitions(Tools.SchemaTest PRIVATE
-  ZULM_DOCS="${PROJECT_SOURCE_DIR}/Docs" ZULM_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/Data")
-zulm_add_tool_test(Tools/ToolRunTest)
-zulm_add_tool_test(Tools/ViewCommandTest)
-target_compile_definitions(Tools.ViewCommandTest PRIVATE ZULM_HAS_PAGE=$<BOOL:${ZULM_VIEWER}>)
-include(Tools/VerifyTests.cmake)
+# Some of these run ffmpeg and ffprobe.
+find_package(nlohmann_json REQUIRED)
+zulm_add_tests(ToolsTests
+  AtomsCommandTest
+  AttachCommandTest
+  CommandLineTest
+  ConvertCommandTest
+  DemoCommandTest
+  DiffCommandTest
+  DumpCommandTest
+  ExtractCommandTest
+  GrepCommandTest
+  InfoCommandTest
+  ManualTest
+  NumberTest
+  OutOfMemoryTest
+  OutputFileTest
+  RedactCommandTest
+  RepairCommandTest
+  SalvageCommandTest
+  SchemaTest
+  StampCommandTest
+  ToolRunTest
+  VerifyCommandTest
+  ViewCommandTest)
+target_link_libraries(ToolsTests PRIVATE
+  ZULMetaDataToolTestSupport ZULMetaDataInvalidCorpus zulm_commands nlohmann_json::nlohmann_json)
+target_compile_definitions(ToolsTests PRIVATE
+  ZULM_PATH="${ZULM_PATH}"
+  ZULM_DOCS="${PROJECT_SOURCE_DIR}/Docs"
+  ZULM_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/Data"
+  ZULM_HAS_PAGE=$<BOOL:${ZULM_VIEWER}>)
+add_dependencies(ToolsTests zulm)

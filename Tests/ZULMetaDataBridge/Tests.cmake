@@ -1,12 +1,27 @@
-include(ZULMetaDataBridge/AtomTests.cmake)
-zulm_add_test(ZULMetaDataBridge/ApplicationValuesTest)
-zulm_add_test(ZULMetaDataBridge/CursorImageMetaDataTest)
-zulm_add_test(ZULMetaDataBridge/EntryDictionaryTest)
-zulm_add_test(ZULMetaDataBridge/EntryTextsTest)
-zulm_add_test(ZULMetaDataBridge/HumanReadableActionsTest)
-zulm_add_test(ZULMetaDataBridge/KindsTest)
-zulm_add_test(ZULMetaDataBridge/MetaDataExcerptTest)
-zulm_add_test(ZULMetaDataBridge/ParserFamilyTest)
-zulm_add_test(ZULMetaDataBridge/SystemDataMetaDataTest)
-zulm_add_test(ZULMetaDataBridge/WriterFamilyTest)
-zulm_add_test(ZULMetaDataBridge/WriterHealthTest)
+zulm_add_tests(ZULMetaDataBridgeTests
+  ApplicationValuesTest
+  CrashedRecordingTest
+  CursorImageMetaDataTest
+  EntryDictionaryTest
+  EntryTextsTest
+  HumanReadableActionsTest
+  InvalidCorpusTest
+  KindsTest
+  MediaFilesTest
+  MetaDataExcerptTest
+  ParserFamilyTest
+  SafeMovieSaveTest
+  StreamRedactionTest
+  StreamSalvageTest
+  SystemDataMetaDataTest
+  WriterFamilyTest
+  WriterHealthTest
+  ZULMAtomRepairTest
+  ZULMAtomWriterTest
+  ZULRAtomWriterTest)
+target_link_libraries(ZULMetaDataBridgeTests PRIVATE ZULMetaDataInvalidCorpus)
+
+# These count the memory that the library asks for.
+zulm_add_tests(ZULMetaDataBridgeMemoryTests
+  MetaDataValidatorTest)
+target_link_libraries(ZULMetaDataBridgeMemoryTests PRIVATE ZULMetaDataInvalidCorpus ZULMetaDataMemoryWatch)

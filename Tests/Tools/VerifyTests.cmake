@@ -1,3 +1,0 @@
-find_package(nlohmann_json REQUIRED)
-zulm_add_tool_test(Tools/VerifyCommandTest)
-target_link_libraries(Tools.VerifyCommandTest PRIVATE ZULMetaDataInvalidCorpus nlohmann_json::nlohmann_json)

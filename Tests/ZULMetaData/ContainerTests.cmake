@@ -1,7 +1,0 @@
-zulm_add_test(ZULMetaData/AtomRepairTest)
-zulm_add_test(ZULMetaData/FileInputBufferTest)
-zulm_add_test(ZULMetaData/ContainerScanTest)
-zulm_add_test(ZULMetaData/MP4MetaDataTest)
-zulm_add_test(ZULMetaData/MetaDataParserTest)
-zulm_add_test(ZULMetaData/ParserUtilTest)
-zulm_add_test(ZULMetaData/SmallAtomsTest)

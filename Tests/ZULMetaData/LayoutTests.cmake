@@ -1,4 +1,0 @@
-zulm_add_test(ZULMetaData/ContainerLayoutTest)
-zulm_add_test(ZULMetaData/ContainerRecognitionTest)
-zulm_add_test(ZULMetaData/MovieDurationTest)
-zulm_add_test(ZULMetaData/RecordingInfoTest)

@@ -1,4 +1,0 @@
-zulm_add_test(ZULMetaDataBridge/MediaFilesTest)
-zulm_add_test(ZULMetaDataBridge/ZULMAtomRepairTest)
-zulm_add_test(ZULMetaDataBridge/ZULMAtomWriterTest)
-zulm_add_test(ZULMetaDataBridge/ZULRAtomWriterTest)

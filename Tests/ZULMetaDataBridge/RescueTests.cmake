@@ -1,3 +1,0 @@
-zulm_add_test(ZULMetaData/StreamEntriesTest)
-zulm_add_test(ZULMetaDataBridge/StreamRedactionTest)
-zulm_add_test(ZULMetaDataBridge/StreamSalvageTest)
