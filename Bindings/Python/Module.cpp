@@ -1,4 +1,4 @@
-// zulmetadata._core: what the package in zulmetadata/ is built on. Its types are described in _core.pyi.
+// zulmetadata._core, the module below the package in zulmetadata/. Its types are described in _core.pyi.
 
 #include "Bindings/Python/EntryArrays.h"
 #include "Bindings/Python/FileError.h"
@@ -163,9 +163,10 @@ void addErrors(py::module_& module) {
     const py::dict unknown("file"_a = "", "sentence"_a = "", "reason"_a = "failed"); // of those that Python code makes
     static const py::handle saveError = PyErr_NewExceptionWithDoc(
         "zulmetadata.SaveError",
-        "A movie was not changed as it should. `file` and `sentence` say which and why; `reason` is 'failed' where\n"
-        "the movie is what it was, 'kind-exists' where it has a stream of that kind already, and 'not-undone' where\n"
-        "the movie could not be made what it was.",
+        "A movie was not changed as it should. `file` is the movie or the source, and `sentence` says why. If "
+        "`reason`\n"
+        "is 'failed' or 'kind-exists', the movie is unchanged; the latter means that it already has a stream of that\n"
+        "kind. If `reason` is 'not-undone', the movie could not be restored.",
         PyExc_RuntimeError, unknown.ptr());
     module.attr("SaveError") = saveError;
     registerFileErrors();
@@ -181,27 +182,28 @@ void addErrors(py::module_& module) {
 
 void addReading(py::module_& module) {
     py::class_<RecordedStream>(module, "RecordedStream",
-                               "A stream of a recording: where it is, and what it says of itself.")
+                               "A stream of a recording: its place in the file, its kind and its version.")
         .def_property_readonly(
             "kind", [](const RecordedStream& stream) { return metaDataKindName(stream.type); },
-            "The name of its kind, or its UUID where that has none.")
+            "The name of the kind, or its UUID if it has no name.")
         .def_property_readonly(
             "uuid", [](const RecordedStream& stream) { return uuidText(stream.type); },
-            "The identifier of its kind, as text.")
+            "The identifier of the kind, as text.")
         .def_property_readonly(
-            "version", [](const RecordedStream& stream) { return stream.header.version; }, "Of its entries.")
-        .def_readonly("offset", &RecordedStream::offset, "Of its header in the file.")
-        .def_readonly("bytes", &RecordedStream::bytes, "Header included, as the container declares.")
+            "version", [](const RecordedStream& stream) { return stream.header.version; },
+            "The version of the entries.")
+        .def_readonly("offset", &RecordedStream::offset, "The position of the header in the file.")
+        .def_readonly("bytes", &RecordedStream::bytes, "The size that the container declares, header included.")
         .def_property_readonly(
             "is_decodable", [](const RecordedStream& stream) { return isDecodable(stream.header); },
-            "Whether `read` knows its kind and version.")
+            "True if `read` knows the kind and the version.")
         .def(
             "read",
             [](const RecordedStream& stream) {
                 return naming(stream.file, [&] { return readEntries(stream.source()); });
             },
-            "Its whole entries, as a NumPy array of records.")
-        .def("raw", bytesOf, "Its bytes, header included.")
+            "Returns the whole entries, as a NumPy array of records.")
+        .def("raw", bytesOf, "Returns the bytes of the stream, header included.")
         .def("__repr__", [](const RecordedStream& stream) {
             return py::str("<RecordedStream {} version={} offset={} bytes={}>")
                 .format(metaDataKindName(stream.type), stream.header.version, stream.offset, stream.bytes);
@@ -213,17 +215,16 @@ void addReading(py::module_& module) {
         .def_property_readonly("duration", &RecordingFile::duration)
         .def_property_readonly("creators", &RecordingFile::creators)
         .def_property_readonly("streams", &RecordingFile::streams);
-    py::class_<CreatorAttributes>(module, "Creator",
-                                  "Who stamped a movie: the platform's name, a version, the system's version.")
+    py::class_<CreatorAttributes>(module, "Creator", "A stamp of a movie: the name of the platform and two versions.")
         .def_property_readonly(
             "name", [](const CreatorAttributes& creator) { return pythonText(creator.name()); },
-            "The platform's: 'Mac' wherever a movie was recorded.")
+            "The name of the platform: 'Mac', whatever the system was.")
         .def_property_readonly(
             "version", [](const CreatorAttributes& creator) { return pythonText(creator.version()); },
-            "Of the application that recorded.")
+            "The version of the application that made the recording.")
         .def_property_readonly(
             "platform_version", [](const CreatorAttributes& creator) { return pythonText(creator.platformVersion()); },
-            "Of the operating system.")
+            "The version of the operating system.")
         .def("__repr__", [](const CreatorAttributes& creator) {
             return py::str("<Creator {!r} version={!r} platform_version={!r}>")
                 .format(pythonText(creator.name()), pythonText(creator.version()),
@@ -241,7 +242,7 @@ py::str keyText(std::uint32_t code) {
 void addKinds(py::module_& module) {
     module.def(
         "dtype_of", [](const std::string& kind) { return typeOfEntries(kindNamed(kind).type); }, py::arg("kind"),
-        "The fields of an entry of this kind. `KeyError` for a kind without entries of its own.");
+        "Returns the fields of an entry of this kind. Raises `KeyError` for a kind without entries.");
     module.def(
         "coordinates_of", [](const std::string& kind) { return coordinatesOf(kindNamed(kind).type); }, py::arg("kind"));
     module.def(
@@ -251,16 +252,16 @@ void addKinds(py::module_& module) {
             RecordedKinds::forEach([&names]<class Kind>() { names.push_back(metaDataKindName(Kind::type)); });
             return names;
         },
-        "The names of all kinds that have entries.");
+        "Returns the names of all kinds that have entries.");
     module.def("action_text", &HumanReadableActions::CursorActionToString, py::arg("action"),
-               "\"left down + shift\" and so on, for \"rawActionValue\" of cursorAction.");
+               "Returns a text such as \"left down + shift\" for a \"rawActionValue\" of cursorAction.");
     module.def("key_text", keyText, py::arg("code"), "The name of a key, for \"characterCode\" of keyboardAction.");
     module.def(
         "modifiers_text",
         [](std::uint32_t flags) {
             return HumanReadableActions::KeyboardModifiersToString(static_cast<std::int32_t>(flags));
         },
-        py::arg("flags"), "\"<Shift><Cmd>\" and so on, for \"eventFlagsCode\" of keyboardAction.");
+        py::arg("flags"), "Returns a text such as \"<Shift><Cmd>\" for an \"eventFlagsCode\" of keyboardAction.");
 }
 
 void addWriting(py::module_& module) {
@@ -284,23 +285,24 @@ void addWriting(py::module_& module) {
 
 void addRepairing(py::module_& module) {
     py::class_<RepairChange>(module, "RepairChange", "Bytes of a movie that a repair replaces.")
-        .def_readonly("offset", &RepairChange::offset, "In the movie.")
+        .def_readonly("offset", &RepairChange::offset, "The position in the movie.")
         .def_property_readonly(
-            "before", [](const RepairChange& change) { return py::bytes(change.before); }, "What stands there now.")
+            "before", [](const RepairChange& change) { return py::bytes(change.before); },
+            "The bytes before the repair.")
         .def_property_readonly(
             "after", [](const RepairChange& change) { return py::bytes(change.after); },
-            "Empty where the file's last bytes are cut off.")
-        .def_readonly("reason", &RepairChange::reason, "One sentence.")
+            "The bytes after the repair; empty if the end of the file is cut off.")
+        .def_readonly("reason", &RepairChange::reason, "The reason, in one sentence.")
         .def("__repr__", [](const RepairChange& change) {
             return py::str("<RepairChange offset={} bytes={}: {}>")
                 .format(change.offset, change.before.size(), change.reason);
         });
-    py::class_<RepairPlan>(module, "Repair", "What is wrong with a movie's atoms, and what mends it.")
+    py::class_<RepairPlan>(module, "Repair", "What is wrong with the atoms of a movie, and how it is repaired.")
         .def_property_readonly("state", stateOf, "'whole', 'repairable' or 'unrepairable'.")
         .def_readonly("changes", &RepairPlan::changes,
-                      "What mends it, in the order in which it is done; empty where nothing does.")
-        .def_readonly("finding", &RepairPlan::finding, "What is wrong, in one sentence; empty where nothing is.")
-        .def_readonly("offset", &RepairPlan::offset, "Of the atom that is wrong.")
+                      "The changes, in the order in which they are made; empty if there is no repair.")
+        .def_readonly("finding", &RepairPlan::finding, "What is wrong, in one sentence; empty if nothing is.")
+        .def_readonly("offset", &RepairPlan::offset, "The position of the atom that is wrong.")
         .def_readonly("has_loss", &RepairPlan::hasLoss, "Part of an interrupted append never got into the movie.")
         .def("__repr__", [](const RepairPlan& plan) {
             return py::str("<Repair {} changes={}>").format(stateOf(plan), plan.changes.size());
@@ -309,23 +311,24 @@ void addRepairing(py::module_& module) {
 }
 
 void addSaving(py::module_& module) {
-    py::class_<AttachedStream>(module, "AttachedStream", "What became of one stream that was attached.")
+    py::class_<AttachedStream>(module, "AttachedStream", "A stream that was attached.")
         .def_property_readonly(
-            "name", [](const AttachedStream& stream) { return pathText(stream.name); }, "The path of its source.")
+            "name", [](const AttachedStream& stream) { return pathText(stream.name); }, "The path of the source.")
         .def_property_readonly(
             "kind", [](const AttachedStream& stream) { return metaDataKindName(stream.type); },
-            "The name of its kind, or its UUID where that has none.")
-        .def_readonly("offset", &AttachedStream::offset, "Of its header in the movie.")
-        .def_readonly("bytes", &AttachedStream::bytes, "Header and whole entries.")
-        .def_readonly("entries", &AttachedStream::entries, "That are whole, and in the movie now.")
-        .def_readonly("bytes_cut", &AttachedStream::bytesCut, "What stood behind its last whole entry.")
+            "The name of the kind, or its UUID if it has no name.")
+        .def_readonly("offset", &AttachedStream::offset, "The position of the header in the movie.")
+        .def_readonly("bytes", &AttachedStream::bytes, "The size of the header and the whole entries.")
+        .def_readonly("entries", &AttachedStream::entries, "The number of whole entries, which are now in the movie.")
+        .def_readonly("bytes_cut", &AttachedStream::bytesCut,
+                      "The number of bytes after the last whole entry, left out.")
         .def("__repr__", [](const AttachedStream& stream) {
             return py::str("<AttachedStream {} offset={} entries={} bytes_cut={}>")
                 .format(metaDataKindName(stream.type), stream.offset, stream.entries, stream.bytesCut);
         });
     py::class_<AttachResult>(module, "Attached", "What `attach` did.")
-        .def_readonly("repair", &AttachResult::repair, "What was done before.")
-        .def_readonly("streams", &AttachResult::streams, "In the order in which they were given.")
+        .def_readonly("repair", &AttachResult::repair, "The repair that was made first.")
+        .def_readonly("streams", &AttachResult::streams, "The streams, in the order of the arguments.")
         .def("__repr__", [](const AttachResult& attached) {
             return py::str("<Attached streams={} repair={}>").format(attached.streams.size(), stateOf(attached.repair));
         });
@@ -337,13 +340,13 @@ void addVerifying(py::module_& module) {
     py::class_<Finding>(module, "Finding", "Something that `verify` found.")
         .def_property_readonly(
             "code", [](const Finding& finding) { return ruleOf(finding.code).name; },
-            "Such as 'torn-entry'; the same for every finding of the sort.")
+            "The name of the rule, such as 'torn-entry'.")
         .def_property_readonly(
             "is_damage", [](const Finding& finding) { return finding.severity() == Severity::Damage; },
-            "Whether something is lost, cannot be reached, or contradicts itself.")
+            "True if something is lost, cannot be reached, or contradicts itself.")
         .def_readonly("place", &Finding::place, "The kind of the stream, or the type of the atom.")
-        .def_readonly("offset", &Finding::offset, "In the file.")
-        .def_readonly("sentence", &Finding::sentence, "For people, with the numbers in question.")
+        .def_readonly("offset", &Finding::offset, "The position in the file.")
+        .def_readonly("sentence", &Finding::sentence, "What was found, in a sentence with the numbers.")
         .def("__str__",
              [](const Finding& finding) {
                  return finding.place + " at offset " + std::to_string(finding.offset) + ": " + finding.sentence;
@@ -352,34 +355,36 @@ void addVerifying(py::module_& module) {
             return py::str("<Finding {} {} offset={}: {}>")
                 .format(ruleOf(finding.code).name, finding.place, finding.offset, finding.sentence);
         });
-    py::class_<StreamReport>(module, "StreamReport", "What `verify` saw of one stream.")
-        .def_property_readonly("kind", &StreamReport::name, "The name of its kind, or its UUID where that has none.")
-        .def_readonly("version", &StreamReport::version, "Of its entries; -1 where its header is cut short.")
-        .def_readonly("offset", &StreamReport::offset, "Of its header in the file.")
-        .def_readonly("entries", &StreamReport::wholeEntries, "That are whole and fit their own sizes.")
+    py::class_<StreamReport>(module, "StreamReport", "What `verify` says about one stream.")
+        .def_property_readonly("kind", &StreamReport::name, "The name of the kind, or its UUID if it has no name.")
+        .def_readonly("version", &StreamReport::version, "The version of the entries; -1 if the header is cut short.")
+        .def_readonly("offset", &StreamReport::offset, "The position of the header in the file.")
+        .def_readonly("entries", &StreamReport::wholeEntries, "The number of entries that are whole and valid.")
         .def_readonly("first_time", &StreamReport::firstTime,
-                      "Seconds, of the first entry with a finite time; None where there is none.")
-        .def_readonly("last_time", &StreamReport::lastTime, "Seconds, of the last entry with a finite time.")
-        .def_readonly("is_reachable", &StreamReport::isReachable, "Whether readers find it.")
+                      "The time in seconds of the first entry whose time is finite, or None.")
+        .def_readonly("last_time", &StreamReport::lastTime,
+                      "The time in seconds of the last entry whose time is finite, or None.")
+        .def_readonly("is_reachable", &StreamReport::isReachable, "True if readers find the stream.")
         .def("__repr__", [](const StreamReport& stream) {
             return py::str("<StreamReport {} offset={} entries={}>")
                 .format(stream.name(), stream.offset, stream.wholeEntries);
         });
-    py::class_<ValidationReport>(module, "Report", "What `verify` says of a file.")
-        .def_readonly("bytes", &ValidationReport::bytes, "In the file.")
-        .def_readonly("streams", &ValidationReport::streams, "In the order of the file; of very many only the first.")
+    py::class_<ValidationReport>(module, "Report", "What `verify` says about a file.")
+        .def_readonly("bytes", &ValidationReport::bytes, "The size of the file.")
+        .def_readonly("streams", &ValidationReport::streams, "The streams, in the order of the file; at most 1000.")
         .def_property_readonly("findings", &ValidationReport::allFindings,
-                               "In the order of their offsets; of very many only the first.")
-        .def_property_readonly("is_damaged", &ValidationReport::isDamaged, "Whether any of the findings is damage.")
+                               "The findings, in the order of their offsets; a very long list is cut off.")
+        .def_property_readonly("is_damaged", &ValidationReport::isDamaged, "True if a finding is damage.")
         .def_property_readonly("has_metadata", &ValidationReport::hasMetaData,
-                               "Whether there are streams, whole or not.")
+                               "True if there are streams, whole or not.")
         .def("__repr__", [](const ValidationReport& report) {
             return py::str("<Report bytes={} streams={} findings={}{}>")
                 .format(report.bytes, report.streamCount, report.damageCount + report.noticeCount,
                         report.isDamaged() ? ": damaged" : "");
         });
-    module.def("verify", verify, py::arg("path"),
-               "What is wrong with the metadata of a movie, RIFF file or stream file. Changes nothing.");
+    module.def(
+        "verify", verify, py::arg("path"),
+        "Checks the metadata of a movie, RIFF file or stream file, and returns a report. Does not change the file.");
 }
 
 } // namespace
