@@ -41,9 +41,16 @@ Sequence sequenceOf(unsigned char first) {
     return {0};
 }
 
-/// Bytes of the valid character that `bytes` begins with; 0 where there is none.
+std::string_view upToZeroByte(std::string_view bytes) {
+    return bytes.substr(0, bytes.find('\0'));
+}
+
+} // namespace
+
 std::size_t validCharacterLength(std::string_view bytes) {
     const auto byteAt = [bytes](std::size_t index) { return static_cast<unsigned char>(bytes[index]); };
+    if (bytes.empty())
+        return 0;
     const Sequence sequence = sequenceOf(byteAt(0));
     if (sequence.length > bytes.size())
         return 0;
@@ -54,12 +61,6 @@ std::size_t validCharacterLength(std::string_view bytes) {
             return 0;
     return sequence.length;
 }
-
-std::string_view upToZeroByte(std::string_view bytes) {
-    return bytes.substr(0, bytes.find('\0'));
-}
-
-} // namespace
 
 bool isUTF8(std::string_view bytes) {
     return validUTF8Length(bytes) == bytes.size();
@@ -83,18 +84,28 @@ std::string textFromUTF8(const std::string& bytes) {
     return std::string(text);
 }
 
-std::string textFromLatin1(const std::string& bytes) {
+std::string utf8Character(std::uint32_t codePoint) {
+    const auto continuation = [codePoint](int shift) { return static_cast<char>(0x80 | (codePoint >> shift & 0x3f)); };
+    if (codePoint < 0x80)
+        return {static_cast<char>(codePoint)};
+    if (codePoint < 0x800)
+        return {static_cast<char>(0xc0 | codePoint >> 6), continuation(0)};
+    if (codePoint >= 0x110000 || (codePoint >= 0xd800 && codePoint <= 0xdfff))
+        return {};
+    if (codePoint < 0x10000)
+        return {static_cast<char>(0xe0 | codePoint >> 12), continuation(6), continuation(0)};
+    return {static_cast<char>(0xf0 | codePoint >> 18), continuation(12), continuation(6), continuation(0)};
+}
+
+std::string utf8FromLatin1(std::string_view bytes) {
     std::string text;
-    for (const char c : upToZeroByte(bytes)) {
-        const auto code = static_cast<unsigned char>(c);
-        if (code < 0x80) {
-            text += c;
-        } else {
-            text += static_cast<char>(0xc0 | code >> 6);
-            text += static_cast<char>(0x80 | (code & 0x3f));
-        }
-    }
+    for (const char c : bytes)
+        text += utf8Character(static_cast<unsigned char>(c));
     return text;
+}
+
+std::string textFromLatin1(const std::string& bytes) {
+    return utf8FromLatin1(upToZeroByte(bytes));
 }
 
 } // namespace ZULMetaData

@@ -5,6 +5,7 @@
 #include "../../SharedDependencies/Export.h"
 
 #include <cstddef>
+#include <cstdint>
 #include <string>
 #include <string_view>
 
@@ -14,6 +15,15 @@ ZULMETADATA_API bool isUTF8(std::string_view bytes); ///< overlong forms and sur
 
 /// Bytes of the whole, valid characters that `bytes` begins with.
 ZULMETADATA_API std::size_t validUTF8Length(std::string_view bytes);
+
+/// Returns the length of the valid character that `bytes` begins with, or 0 if it begins with none or is empty.
+ZULMETADATA_API std::size_t validCharacterLength(std::string_view bytes);
+
+/// Returns the character with this number as UTF-8. Empty for surrogates and for numbers beyond U+10FFFF.
+ZULMETADATA_API std::string utf8Character(std::uint32_t codePoint);
+
+/// Returns all bytes as UTF-8, each the character of its number (ISO 8859-1).
+ZULMETADATA_API std::string utf8FromLatin1(std::string_view bytes);
 
 /// The bytes up to the first zero byte. Throws `std::invalid_argument` where they are not UTF-8.
 ZULMETADATA_API std::string textFromUTF8(const std::string& bytes);

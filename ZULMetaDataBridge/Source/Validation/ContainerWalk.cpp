@@ -12,13 +12,13 @@ namespace {
 constexpr std::string_view s_file = "file";
 constexpr std::string_view s_metaData = "ZULM";
 
-/// Four characters; those that cannot be printed by their numbers.
+/// Four characters; the backslash, and those that cannot be printed, by their numbers.
 std::string nameOf(std::uint32_t type) {
     constexpr std::string_view digits = "0123456789abcdef";
     std::string name;
     for (int shift = 24; shift >= 0; shift -= 8) {
         const std::uint32_t byte = type >> shift & 0xff;
-        if (byte >= 0x20 && byte < 0x7f)
+        if (byte >= 0x20 && byte < 0x7f && byte != '\\')
             name += static_cast<char>(byte);
         else
             name.append("\\x").append({digits[byte >> 4], digits[byte & 0xf]});
