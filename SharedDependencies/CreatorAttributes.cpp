@@ -33,6 +33,12 @@ std::string load(const char (&field)[Size]) {
     return {std::begin(field), std::find(std::begin(field), std::end(field), '\0')};
 }
 
+template <std::size_t Size>
+std::string loadWhole(const char (&field)[Size]) {
+    const std::string_view whole(field, Size);
+    return std::string(whole.substr(0, whole.find_last_not_of('\0') + 1));
+}
+
 } // namespace
 
 void CreatorAttributes::setName(const std::string& name) {
@@ -57,6 +63,10 @@ std::string CreatorAttributes::version() const {
 
 std::string CreatorAttributes::platformVersion() const {
     return load(platformVersion_);
+}
+
+std::array<std::string, 3> CreatorAttributes::storedTexts() const {
+    return {loadWhole(name_), loadWhole(version_), loadWhole(platformVersion_)};
 }
 
 std::string CreatorAttributes::platformNameMac() {

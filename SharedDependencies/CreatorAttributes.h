@@ -4,6 +4,7 @@
 
 #include "Export.h"
 
+#include <array>
 #include <cstddef>
 #include <string>
 #include <type_traits>
@@ -28,6 +29,9 @@ public:
     std::string version() const;
     std::string platformVersion() const;
     ///@}
+
+    /// Returns the three fields with everything that is stored in them, without the zero bytes at their ends.
+    std::array<std::string, 3> storedTexts() const;
 
     /// Returns "Mac". It is stored as the name on every platform.
     static std::string platformNameMac();

@@ -99,6 +99,20 @@ TEST_F(DiffCommand, ComparesOnlyTheChosenKinds) {
     EXPECT_EQ(runTool({"diff", left, right, "--stream", "topmostAppName"}).exitCode, 3);
 }
 
+TEST_F(DiffCommand, ShowsInWhatNumbersAndTextsDiffer) {
+    const std::string opacity = streamHeader("2b7b6af3", 1, 16) + f64(1);
+    const std::string numbers =
+        runTool({"diff", write("a.dat", opacity + f64(1e39)), write("b.dat", opacity + f64(2e39))}).output;
+    EXPECT_THAT(numbers, HasSubstr("opacity=1e+39\n"));
+    EXPECT_THAT(numbers, HasSubstr("opacity=2e+39\n"));
+    const std::string names = streamHeader(s_appNames, 1, 0);
+    const std::string texts = runTool({"diff", write("a.dat", names + textEntry(1, std::string("a\0b", 3))),
+                                       write("b.dat", names + textEntry(1, std::string("a\0c", 3)))})
+                                  .output;
+    EXPECT_THAT(texts, HasSubstr("name=\"a\\x00b\"\n"));
+    EXPECT_THAT(texts, HasSubstr("name=\"a\\x00c\"\n"));
+}
+
 TEST_F(DiffCommand, ComparesStreamsOfUnknownKindsByTheirBytes) {
     const std::string header = streamHeader("deadbeef", 1, 4);
     const std::string left = write("a.dat", header + "abcdefgh");

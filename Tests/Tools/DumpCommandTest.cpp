@@ -149,19 +149,80 @@ TEST_F(DumpCommand, KeepsTheBytesOfTextsThatAreNotUTF8) {
     EXPECT_EQ(entries.at(0).at("name_base64"), "Q2Fm6Q==");
     EXPECT_EQ(entries.at(1).at("name"), "Caf\xc3\xa9");
     EXPECT_FALSE(entries.at(1).contains("name_base64"));
-    EXPECT_EQ(entries.at(2).at("name"), "a"); // what a reader gets of it
-    EXPECT_EQ(entries.at(2).at("name_base64"), "YQBi");
+    EXPECT_EQ(entries.at(2).at("name"), std::string("a\0b", 3));
+    EXPECT_FALSE(entries.at(2).contains("name_base64"));
 }
 
-TEST_F(DumpCommand, KeepsTheByteOfAKeyThatIsNoCharacter) {
-    const auto entries = entriesOf(streamHeader("2b7b6af5", 1, 16) + f64(1) + le32(200) + le32(0));
-    EXPECT_EQ(entries.at(0).at("characterString"), "\xef\xbf\xbd");
-    EXPECT_EQ(entries.at(0).at("characterString_base64"), "yA==");
+TEST_F(DumpCommand, TakesCodesForCharactersUnlessTheyAreVirtualKeys) {
+    std::string stream = streamHeader("2b7b6af5", 1, 16);
+    std::string text;
+    for (const char c : std::string("hello world"))
+        stream += f64(1) + le32(static_cast<unsigned char>(c)) + le32(0);
+    for (const std::uint32_t code : {0x444U, 13U, 0xffffffffU})
+        stream += f64(1) + le32(code) + le32(0);
+    stream += f64(1) + le32(119) + le32(0xc0000000);
+    const auto entries = entriesOf(stream);
+    for (std::size_t i = 0; i < 11; ++i)
+        text += entries.at(i).at("characterString").get<std::string>();
+    EXPECT_EQ(text, "hello world");
+    EXPECT_EQ(entries.at(11).at("characterString"), "\xd1\x84");
+    EXPECT_EQ(entries.at(12).at("characterString"), "returnKey");
+    EXPECT_EQ(entries.at(13).at("characterString"), "key 4294967295");
+    EXPECT_EQ(entries.at(13).at("characterCode"), 4294967295U);
+    EXPECT_EQ(entries.at(14).at("characterString"), "f8");
+    EXPECT_EQ(entries.at(14).at("eventFlagsCode"), 0xc0000000U);
+}
+
+TEST_F(DumpCommand, ShowsNumbersAsTheyAreStored) {
+    const auto opacities = entriesOf(streamHeader("2b7b6af3", 1, 16) + f64(1) + f64(1e39) + f64(2) + f64(0.1) + f64(3) +
+                                     f64(std::numeric_limits<double>::infinity()));
+    EXPECT_EQ(opacities.at(0).at("opacity"), 1e39);
+    EXPECT_EQ(opacities.at(1).at("opacity"), 0.1);
+    EXPECT_EQ(opacities.at(2).at("opacity"), "Infinity");
+    const std::string cursor = raw(0xfedcba9876543210U) + le32(8) + le32(0);
+    const auto images = entriesOf(streamHeader("2b7b6af1", 1, 0) + le32(28) + f64(1) + cursor);
+    EXPECT_EQ(images.at(0).at("id"), "18364758544493064720");
 }
 
 TEST_F(DumpCommand, ShowsControlCharactersInsteadOfSendingThem) {
     written("a.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "\x1b[2J\n\"q\"\xc2\x9b"));
-    EXPECT_EQ(run({"a.dat"}).output, "    1.000000  name=\"\\\\x1b[2J\\\\x0a\\\"q\\\"\\\\x9b\"\n");
+    EXPECT_EQ(run({"a.dat"}).output, "    1.000000  name=\"\\x1b[2J\\x0a\\\"q\\\"\\u{9b}\"\n");
+}
+
+TEST_F(DumpCommand, ShowsTextsWholeAndNoTwoOfThemAlike) {
+    written("a.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, std::string("a\0b", 3)) + textEntry(2, "\x1b\xff") +
+                         textEntry(3, "\\x1b\xef\xbf\xbd") + textEntry(4, "\xe2\x80\xae\n\t,"));
+    EXPECT_EQ(run({"a.dat"}).output, "    1.000000  name=\"a\\x00b\"\n"
+                                     "    2.000000  name=\"\\x1b\\xff\"\n"
+                                     "    3.000000  name=\"\\\\x1b\xef\xbf\xbd\"\n"
+                                     "    4.000000  name=\"\\u{202e}\\x0a\\x09,\"\n");
+    EXPECT_EQ(run({"--format", "csv", "a.dat"}).output, "stream,name,timestamp\n"
+                                                        "topmostAppName,a\\x00b,1.0\n"
+                                                        "topmostAppName,\\x1b\\xff,2.0\n"
+                                                        "topmostAppName,\\\\x1b\xef\xbf\xbd,3.0\n"
+                                                        "topmostAppName,\"\\u{202e}\n\\x09,\",4.0\n");
+    EXPECT_THAT(run({"--format", "json", "a.dat"}).output, HasSubstr("\"\\u202e\\n\\t,\""));
+}
+
+TEST_F(DumpCommand, WritesTablesThatOtherProgramsRead) {
+    const std::string hostile("\0\r\n\"a\",\x1b\\x1b\xff\n\xe2\x80\xa8", 20);
+    written("a.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, hostile) + textEntry(2, "plain"));
+    ToolOptions options;
+    options.input = run({"--format", "csv", "a.dat"}).output;
+    const ToolResult rows = runProgram(
+        "python3",
+        {"-c", "import csv, re, sys\n"
+               "rows = list(csv.reader(open(0, newline='')))\n"
+               "text = re.sub(rb'\\\\(?:x(..)|u\\{(\\w+)\\}|(\\\\))', lambda m: bytes.fromhex(m[1].decode()) "
+               "if m[1] else chr(int(m[2], 16)).encode() if m[2] else m[3], rows[1][1].encode())\n"
+               "print(len(rows), {len(row) for row in rows}, rows[2][1], text.hex())\n"},
+        options);
+    std::string digits;
+    for (const char c : hostile) {
+        digits += "0123456789abcdef"[static_cast<unsigned char>(c) >> 4];
+        digits += "0123456789abcdef"[c & 0xf];
+    }
+    EXPECT_EQ(rows.output, "3 {3} plain " + digits + "\n") << rows.errors;
 }
 
 TEST_F(DumpCommand, QuotesFieldsOfTables) {
@@ -179,12 +240,18 @@ TEST_F(DumpCommand, ShowsListsWithTooFewAndTooManyTexts) {
                bytes;
     };
     const auto entries =
-        entriesOf(streamHeader("2b7b6afc", 1, 0) + list({"a", "b"}) + list({"1", "2", "3", "4", "5"}), 3);
+        entriesOf(streamHeader("2b7b6afc", 1, 0) + list({"a", "b"}) + list({"1", "2", "3", "4", "5", "\xe9"}), 3);
     EXPECT_EQ(entries.at(0).at("activeProcessorCount"), "b");
     EXPECT_EQ(entries.at(0).at("osVersion"), nullptr);
     EXPECT_THAT(entries.at(0).at("damage").get<std::string>(), HasSubstr("2 texts"));
     EXPECT_EQ(entries.at(1).at("ram"), "4");
-    EXPECT_EQ(entries.at(1).at("further"), json::array({"5"}));
+    EXPECT_EQ(entries.at(1).at("further"), json::array({"5", "\xc3\xa9"}));
+    EXPECT_EQ(entries.at(1).at("further_base64"), json::array({"NQ==", "6Q=="}));
+    EXPECT_EQ(run({"--format", "csv", "stream.dat"}).output,
+              "stream,processorCount,activeProcessorCount,osVersion,ram,further,timestamp\n"
+              "systemData,a,b,,,,0.0\n"
+              "systemData,1,2,3,4,\"[\"\"5\"\",\"\"\xc3\xa9\"\"]\",0.0\n");
+    EXPECT_THAT(run({"stream.dat"}).output, HasSubstr("ram=\"4\"  further=[\"5\",\"\xc3\xa9\"]\n"));
 }
 
 TEST_F(DumpCommand, WritesImagesAsTheyAreStored) {

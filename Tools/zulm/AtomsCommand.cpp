@@ -70,8 +70,7 @@ void printItem(const LayoutItem& entry, int depth) {
 }
 
 void print(const Recording& recording, const Layout& layout) {
-    writeOutput(
-        fmt::format("{}: {}, {} bytes\n", withoutControls(recording.name()), recording.container(), layout.fileSize));
+    writeOutput(fmt::format("{}: {}, {} bytes\n", shown(recording.name()), recording.container(), layout.fileSize));
     writeOutput(
         heading(fmt::format("  {:<12}  {:>16}  {:>16}  {:<10}  {}", "type", "offset", "size", "header", "stream")) +
         '\n');
@@ -89,7 +88,7 @@ ExitCode showAtoms(const std::string& path, const AtomsOptions& options, Json& f
             fmt::format("{}: a bare stream has no atoms; 'zulm info {}' shows what it is", path, shellWord(path)));
     const Layout layout = layoutOf(recording);
     for (const LayoutEnd& end : layout.ends)
-        warn(fmt::format("{}: the walk ends at offset {}: {}", path, end.offset, end.reason));
+        warnAbout(path, fmt::format("the walk ends at offset {}: {}", end.offset, end.reason));
     if (options.json)
         files.push_back(fileDocument(recording, layout));
     else

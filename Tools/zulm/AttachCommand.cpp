@@ -118,7 +118,7 @@ const char* cutText(StreamExtent::End end) {
 
 void print(const std::string& name, const AttachResult& attached) {
     printRepair(name, attached.repair);
-    writeOutput(fmt::format("{}: {} stream{} attached\n", withoutControls(name), attached.streams.size(),
+    writeOutput(fmt::format("{}: {} stream{} attached\n", shown(name), attached.streams.size(),
                             attached.streams.size() == 1 ? "" : "s"));
     for (const AttachedStream& stream : attached.streams)
         writeOutput(fmt::format("  {:<23}  {:>9} {:<7}  {:>10} bytes\n", metaDataKindName(stream.type), stream.entries,
@@ -138,7 +138,8 @@ Json streamDocument(const AttachedStream& stream) {
 
 void report(const AttachOptions& options, const std::string& name, const AttachResult& attached) {
     Json file = fileHeader(options.save.movie);
-    file.update(Json{{"output", name}, {"repair", repairDocument(attached.repair)}, {"streams", Json::array()}});
+    addText(file, "output", name);
+    file.update(Json{{"repair", repairDocument(attached.repair)}, {"streams", Json::array()}});
     for (const auto& stream : attached.streams)
         file["streams"].push_back(streamDocument(stream));
     printReport("attach", Json::array({file}));

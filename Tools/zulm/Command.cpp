@@ -19,27 +19,34 @@ namespace Zulm {
 
 namespace {
 
-/// `lead` goes in front, coloured where standard error is.
+constexpr auto s_warning = "zulm: warning:";
+
+/// Prints what is shown already after `lead`, which is coloured if standard error is.
 void printLine(const std::string& lead, fmt::color color, const std::string& message) {
     const std::string shownLead = useColor(stderr) ? fmt::format(fmt::emphasis::bold | fg(color), "{}", lead) : lead;
-    const std::string line = fmt::format("{} {}\n", shownLead, withoutControls(message));
+    const std::string line = fmt::format("{} {}\n", shownLead, message);
     std::fwrite(line.data(), 1, line.size(), stderr); // nobody can be told where even this fails
 }
 
 } // namespace
 
 void complain(const std::string& message) {
-    printLine("zulm:", fmt::color::red, message);
+    printLine("zulm:", fmt::color::red, shownMessage(message));
 }
 
 void warn(const std::string& message) {
     if (!settings().quiet)
-        printLine("zulm: warning:", fmt::color::orange, message);
+        printLine(s_warning, fmt::color::orange, shownMessage(message));
+}
+
+void warnAbout(const std::string& file, const std::string& shownSentence) {
+    if (!settings().quiet)
+        printLine(s_warning, fmt::color::orange, fmt::format("{}: {}", shown(file), shownSentence));
 }
 
 void say(const std::string& message) {
     if (settings().verbose)
-        printLine("zulm:", fmt::color::gray, message);
+        printLine("zulm:", fmt::color::gray, shownMessage(message));
 }
 
 ExitCode worseOf(ExitCode left, ExitCode right) {

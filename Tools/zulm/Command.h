@@ -45,6 +45,9 @@ void complain(const std::string& message);
 /// The same for what a person should know though the work could be done. Not with --quiet.
 void warn(const std::string& message);
 
+/// A warning about a file whose sentence holds escapes already: "FILE: SENTENCE".
+void warnAbout(const std::string& file, const std::string& shownSentence);
+
 /// The same for what is being done. Only with --verbose.
 void say(const std::string& message);
 

@@ -230,7 +230,7 @@ private:
         code_ = ExitDamaged;
         addStream(stream, {{"status", status}});
         if (!options_.json)
-            writeOutput(fmt::format("{}: only in {}\n", stream.name(), withoutControls(file)));
+            writeOutput(fmt::format("{}: only in {}\n", stream.name(), shown(file)));
     }
 
     void compare(const HeldStream& leftStream, const HeldStream& rightStream) {

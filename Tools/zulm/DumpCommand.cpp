@@ -7,6 +7,7 @@
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Recording.h"
+#include "Tools/zulm/Report.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
@@ -132,7 +133,7 @@ private:
             fmt::format("cursor-{}-entry-{}{}", cursor.uniqueId, read_, isPNG(bytes) ? ".png" : ".tiff");
         const auto file = std::filesystem::path(options_.imageFolder) / name;
         writeWholeFile(file.string(), std::string(bytes), {recording_.name()}, options_.force);
-        entry["image"]["file"] = validText(file.string());
+        addText(entry["image"], "file", file.string());
         say(fmt::format("{} written", file.string()));
     }
 
@@ -161,7 +162,8 @@ ExitCode dumpStream(Recording& recording, const DumpOptions& options, Printout& 
                     bool isOnlyOne) {
     ExitCode code = ExitFine;
     const bool isDecoded = stream.isDecodable && RecordedKinds::visit(stream.type, [&]<class Kind>() {
-                               printout.beginStream(stream, &entryKeys<Kind>(), isOnlyOne);
+                               const EntryKeys keys = tableKeys<Kind>();
+                               printout.beginStream(stream, &keys, isOnlyOne);
                                code = dumpEntries<Kind>(recording, options, printout, stream);
                            });
     if (!isDecoded) {

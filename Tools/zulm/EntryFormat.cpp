@@ -1,13 +1,19 @@
 #include "Tools/zulm/EntryFormat.h"
 
+#include "Platform/Image.h"
 #include "Tools/zulm/Number.h"
 #include "Tools/zulm/Report.h"
+#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 #include <fmt/ranges.h>
 
+#include <algorithm>
 #include <cmath>
+#include <iterator>
+#include <memory>
 #include <string_view>
+#include <utility>
 #include <variant>
 
 namespace Zulm {
@@ -21,30 +27,20 @@ constexpr auto s_time = "timestamp";
 constexpr auto s_shortTime = "timestamp_f32";
 constexpr auto s_damage = "damage";
 constexpr auto s_image = "image";
+constexpr auto s_further = "further";
 constexpr std::string_view s_storedSuffix = "_base64";
 
-Json document(std::int32_t value) {
-    return value;
-}
-Json document(std::int64_t value) { // more than a JSON number holds everywhere
-    return std::to_string(value);
-}
-Json document(float value) {
-    return std::isfinite(value) ? Json(shortestNumber(value)) : numberDocument(value);
-}
-Json document(const std::string& value) {
-    return validText(value);
-}
-Json document(const std::shared_ptr<const Image>& image) {
-    return {{"width", image->width()}, {"height", image->height()}};
+/// The bytes of a text of the entry: what is stored if its text had to be mended, else the text.
+std::string bytesOf(const Json& entry, const std::string& key) {
+    const auto& text = entry[key].get_ref<const std::string&>();
+    const auto stored = entry.find(key + std::string(s_storedSuffix));
+    if (stored == entry.end())
+        return text;
+    std::string bytes = bytesOfBase64(stored->get_ref<const std::string&>());
+    return validText(bytes) == text ? bytes : text; // texts of ISO 8859-1 are whole already
 }
 
-void addStored(Json& entry, const std::string& key, const std::string& stored) {
-    if (entry[key].get_ref<const std::string&>() != stored)
-        entry[key + std::string(s_storedSuffix)] = base64(stored);
-}
-
-/// A value on its own: texts without quotes, an image as 32x32 (1234 bytes).
+/// A value that is no text: an image as 32x32 (1234 bytes).
 std::string plain(const Json& value) {
     if (value.is_object() && value.contains(s_damage))
         return fmt::format("({} bytes, {})", value["bytes"].get<std::uint32_t>(),
@@ -54,7 +50,25 @@ std::string plain(const Json& value) {
                            value["height"].get<std::uint32_t>(), value["bytes"].get<std::uint32_t>());
     if (value.is_null())
         return "nil";
-    return value.is_string() ? value.get<std::string>() : jsonLine(value);
+    return value.is_string() ? shown(value.get_ref<const std::string&>()) : jsonLine(value);
+}
+
+std::string quoted(const std::string& bytes) {
+    std::string text(1, '"');
+    for (const char c : shown(bytes))
+        text.append(c == '"' ? "\\" : "").append(1, c);
+    return text += '"';
+}
+
+std::string csvText(std::string_view bytes) {
+    std::string text;
+    while (!bytes.empty()) {
+        const std::string_view line = bytes.substr(0, bytes.find('\n'));
+        bytes.remove_prefix(line.size());
+        text.append(shown(line)).append(bytes.substr(0, 1));
+        bytes.remove_prefix(std::min<std::size_t>(bytes.size(), 1));
+    }
+    return text;
 }
 
 std::string csvField(const std::string& text) {
@@ -72,49 +86,71 @@ bool isShownInText(std::string_view key) {
 
 } // namespace
 
-Json entryDocument(const EntryDictionary& entry, double time) {
-    Json result = Json::object();
-    for (const auto& [key, value] : entry)
-        result[key] = std::visit([](const auto& held) { return document(held); }, value);
-    for (const auto& [key, value] : entry)
-        if (const auto* text = std::get_if<std::string>(&value))
-            addStored(result, key, *text);
-    result[s_time] = numberDocument(time);
+void EntryDocument::add(const char* key, std::uint64_t value) {
+    document_[key] = std::to_string(value);
+}
+
+void EntryDocument::add(const char* key, float value) {
+    document_[key] = std::isfinite(value) ? Json(shortestNumber(value)) : numberDocument(value);
+}
+
+void EntryDocument::add(const char* key, double value) {
+    document_[key] = numberDocument(value);
+}
+
+void EntryDocument::add(const char* key, const CursorImage& cursor) {
+    Json& image = document_[key] = nullptr;
+    if (cursor.imageDataSize == 0)
+        return;
+    const EntryValue decoded = entryImage(cursor);
+    if (const auto* pixels = std::get_if<std::shared_ptr<const Image>>(&decoded))
+        image = {{"width", (*pixels)->width()}, {"height", (*pixels)->height()}};
+    else
+        image = {{s_damage, "cannot be decoded"}};
+    image["bytes"] = cursor.imageDataSize;
+}
+
+void EntryDocument::addText(const char* key, const std::string& text, const std::string& stored) {
+    const std::string valid = validText(text);
+    document_[key] = valid;
+    if (valid != stored)
+        further_[key + std::string(s_storedSuffix)] = base64(stored);
+}
+
+void EntryDocument::addList(const std::vector<const char*>& keys, const std::list<std::string>& stored) {
+    auto text = stored.begin();
+    for (const char* key : keys) {
+        if (text == stored.end())
+            document_[key] = nullptr;
+        else
+            addText(key, utf8FromLatin1(*text), *text);
+        text = text == stored.end() ? text : std::next(text);
+    }
+    if (stored.size() < keys.size())
+        further_[s_damage] = fmt::format("{} texts, fewer than its kind has", stored.size());
+    if (text != stored.end())
+        addFurther({text, stored.end()});
+}
+
+void EntryDocument::addFurther(const std::vector<std::string>& stored) {
+    Json texts;
+    Json bytes;
+    for (const std::string& text : stored) {
+        texts.push_back(utf8FromLatin1(text));
+        bytes.push_back(base64(text));
+    }
+    further_[s_further] = texts;
+    if (texts != Json(stored))
+        further_[s_further + std::string(s_storedSuffix)] = bytes;
+}
+
+Json EntryDocument::finished(double time) {
+    document_.update(further_);
+    document_[s_time] = numberDocument(time);
     const auto shortTime = static_cast<float>(time);
     if (static_cast<double>(shortTime) != time && !std::isnan(time))
-        result[s_shortTime] = numberDocument(shortTime); // with the digits that tell it from the exact one
-    return result;
-}
-
-Json textEntryDocument(const EntryDictionary& entry, double time, const std::string& stored) {
-    Json result = entryDocument(entry, time);
-    addStored(result, entry.begin()->first, stored);
-    return result;
-}
-
-Json cursorEntryDocument(const EntryDictionary& entry, double time, const CursorImage& stored) {
-    Json result = entryDocument(entry, time);
-    Json& image = result[s_image];
-    if (!image.is_object())
-        image = stored.imageDataSize == 0 ? Json(nullptr) : Json{{s_damage, "cannot be decoded"}};
-    if (image.is_object())
-        image["bytes"] = stored.imageDataSize;
-    return result;
-}
-
-Json listEntryDocument(const EntryDictionary& entry, double time, const std::list<std::string>& stored) {
-    Json result = entryDocument(entry, time);
-    auto key = entry.begin();
-    auto text = stored.begin();
-    for (; text != stored.end() && key->first != s_time; ++text, ++key)
-        addStored(result, key->first, *text);
-    if (key->first != s_time)
-        result[s_damage] = fmt::format("{} texts, fewer than its kind has", stored.size());
-    for (; key->first != s_time; ++key)
-        result[key->first] = nullptr;
-    for (; text != stored.end(); ++text)
-        result["further"].push_back(validText(*text));
-    return result;
+        document_[s_shortTime] = numberDocument(shortTime); // with the digits that tell it from the exact one
+    return std::move(document_);
 }
 
 std::string damageOf(const Json& entry) {
@@ -126,29 +162,24 @@ std::string damageOf(const Json& entry) {
                : std::string();
 }
 
-std::string jsonLine(const Json& document) {
-    return document.dump(-1, ' ', false, Json::error_handler_t::replace);
-}
-
 std::string textLine(const Json& entry) {
     const Json& time = entry[s_time];
     std::string line =
         time.is_number() ? fmt::format("{:>12.6f}", time.get<double>()) : fmt::format("{:>12}", plain(time));
     for (const auto& [key, value] : entry.items())
         if (isShownInText(key))
-            line += fmt::format("  {}={}", key,
-                                value.is_string() ? jsonLine(shown(value.get<std::string>())) : plain(value));
+            line += fmt::format("  {}={}", key, value.is_string() ? quoted(bytesOf(entry, key)) : plain(value));
     return line;
 }
 
 std::string csvLine(const Json& entry, const EntryKeys& keys) {
     std::string line;
     for (const std::string& key : keys) {
-        const Json& value = entry.at(key);
         if (&key != &keys.front())
             line += ',';
-        if (!value.is_null())
-            line += csvField(plain(value));
+        const auto value = entry.find(key);
+        if (value != entry.end() && !value->is_null())
+            line += csvField(value->is_string() ? csvText(bytesOf(entry, key)) : plain(*value));
     }
     return line;
 }

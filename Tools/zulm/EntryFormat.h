@@ -2,8 +2,8 @@
 
 // Decoded entries as JSON documents, and these as lines of text, NDJSON and CSV.
 
-#include "Tools/zulm/Text.h"
-#include "ZULMetaDataBridge/ZULMetaDataBridge.h"
+#include "ZULMetaDataBridge/Source/EntryBuilding.h"
+#include "ZULMetaDataBridge/Source/StoredFields.h"
 
 #include <nlohmann/json.hpp>
 
@@ -11,54 +11,69 @@
 #include <cstdint>
 #include <list>
 #include <string>
+#include <tuple>
+#include <vector>
 
 namespace Zulm {
 
 enum class EntryFormat { Text, JSON, NDJSON, CSV };
 
-/// An entry by its keys. Every text is valid; one that is not what is stored has the stored bytes beside it, as
-/// "KEY_base64". "timestamp" is the exact time, "timestamp_f32" its 32-bit form where that is another one. An image
-/// shows as width, height and byte count, or as byte count and "damage".
-nlohmann::ordered_json entryDocument(const ZULMetaData::EntryDictionary& entry, double time);
+/// The document of one entry, put together from the values that are stored. Every text is valid UTF-8; one that is not
+/// what is stored has the stored bytes beside it, as "KEY_base64". "timestamp" is the exact time, "timestamp_f32" its
+/// 32-bit form if that is another one. An image shows as width, height and byte count, or as byte count and "damage".
+class EntryDocument {
+public:
+    void add(const char* key, std::int32_t value) { document_[key] = value; }
+    void add(const char* key, std::uint32_t value) { document_[key] = value; }
+    void add(const char* key, std::uint64_t value); ///< as text: more than a JSON number holds everywhere
+    void add(const char* key, float value);
+    void add(const char* key, double value);
+    void add(const char* key, const std::string& text) { addText(key, text, text); }
+    void add(const char* key, const ZULMetaData::CursorImage& cursor);
 
-/// What is peculiar to values that are more, or less, than the keys of their kind.
-nlohmann::ordered_json textEntryDocument(const ZULMetaData::EntryDictionary& entry, double time,
-                                         const std::string& stored);
-nlohmann::ordered_json cursorEntryDocument(const ZULMetaData::EntryDictionary& entry, double time,
-                                           const ZULMetaData::CursorImage& stored);
-nlohmann::ordered_json listEntryDocument(const ZULMetaData::EntryDictionary& entry, double time,
-                                         const std::list<std::string>& stored);
+    /// Adds a text and, if that is not what is stored, the stored bytes.
+    void addText(const char* key, const std::string& text, const std::string& stored);
 
-/// Filled up with empty texts to as many as an entry of the kind has keys for.
-template <class Kind>
-std::list<std::string> filledUp(std::list<std::string> texts) {
-    if (texts.size() < std::tuple_size_v<decltype(Kind::fields)>)
-        texts.resize(std::tuple_size_v<decltype(Kind::fields)>);
-    return texts;
-}
+    /// Adds the texts of a list under these keys. A text that the list lacks is null, further ones stand in "further".
+    void addList(const std::vector<const char*>& keys, const std::list<std::string>& stored);
+
+    nlohmann::ordered_json finished(double time);
+
+private:
+    void addFurther(const std::vector<std::string>& stored);
+
+    nlohmann::ordered_json document_ = nlohmann::ordered_json::object();
+    nlohmann::ordered_json further_ = nlohmann::ordered_json::object(); ///< what follows the fields
+};
 
 template <class Kind>
 nlohmann::ordered_json entryDocument(double time, const typename Kind::Value& value) {
-    using Value = typename Kind::Value;
-    using ZULMetaData::makeEntry;
-    if constexpr (std::same_as<Value, ZULMetaData::CursorImage>)
-        return cursorEntryDocument(makeEntry<Kind>(time, value), time, value);
-    else if constexpr (std::same_as<Value, std::string>)
-        return textEntryDocument(makeEntry<Kind>(time, validText(value)), time, value);
-    else if constexpr (std::same_as<Value, std::list<std::string>>)
-        return listEntryDocument(makeEntry<Kind>(time, filledUp<Kind>(value)), time, value);
+    EntryDocument document;
+    if constexpr (std::same_as<typename Kind::Value, std::list<std::string>>)
+        document.addList(std::apply([](const auto&... field) { return std::vector{field.key...}; }, Kind::fields),
+                         value);
     else
-        return entryDocument(makeEntry<Kind>(time, value), time);
+        ZULMetaData::detail::visitStoredFields<Kind>(
+            value, [&document](const char* key, const auto& stored) { document.add(key, stored); });
+    return document.finished(time);
+}
+
+/// The columns of a table of these entries. Lists have one more, "further", for the texts that no key is for.
+template <class Kind>
+ZULMetaData::EntryKeys tableKeys() {
+    ZULMetaData::EntryKeys keys = ZULMetaData::entryKeys<Kind>();
+    if constexpr (std::same_as<typename Kind::Value, std::list<std::string>>)
+        keys.insert(keys.end() - 1, "further");
+    return keys;
 }
 
 /// What is wrong with an entry that could be read all the same; empty where nothing is.
 std::string damageOf(const nlohmann::ordered_json& entry);
 
-/// In one line, without its end. Bytes that are no text show as U+FFFD.
-std::string jsonLine(const nlohmann::ordered_json& document);
+/// In one line, without its end. Texts are escaped, and what is not UTF-8 in them shows byte by byte.
 std::string textLine(const nlohmann::ordered_json& entry);
 
-/// The fields under `keys`.
+/// The fields under `keys`. Texts are escaped, but for the ends of their lines; "further" is a JSON array.
 std::string csvLine(const nlohmann::ordered_json& entry, const ZULMetaData::EntryKeys& keys);
 std::string csvHeader(const ZULMetaData::EntryKeys& keys);
 

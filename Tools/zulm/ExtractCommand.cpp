@@ -34,8 +34,13 @@ ExitCode complainAboutCut(const std::string& file, const HeldStream& stream) {
 }
 
 Json streamDocument(const HeldStream& stream, const std::string& output) {
-    return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)},     {"offset", stream.offset},
-            {"bytes", stream.present},           {"declared_bytes", stream.declared}, {"file", output}};
+    Json document{{"kind", kindDocument(stream.type)},
+                  {"uuid", uuidText(stream.type)},
+                  {"offset", stream.offset},
+                  {"bytes", stream.present},
+                  {"declared_bytes", stream.declared}};
+    addText(document, "file", output);
+    return document;
 }
 
 std::vector<std::string> outputsFor(const std::vector<HeldStream>& streams, const std::string& folder) {
@@ -63,7 +68,7 @@ ExitCode runExtract(const ExtractOptions& options) {
         worst = worseOf(worst, complainAboutCut(input.name(), streams[i]));
         document["streams"].push_back(streamDocument(streams[i], outputs[i]));
         if (!options.json)
-            writeOutput(fmt::format("{}: {} bytes\n", outputs[i], streams[i].present));
+            writeOutput(fmt::format("{}: {} bytes\n", shown(outputs[i]), streams[i].present));
     }
     if (options.json)
         printReport("extract", Json::array({document}));

@@ -50,14 +50,13 @@ void printRow(const StreamInfo& stream) {
 
 std::string creatorLine(const CreatorAttributes& creator) {
     const bool isPlatform = creator.name() == CreatorAttributes::platformNameMac();
-    return fmt::format("  creator: {} {} on version {}{}\n", shown(creator.name()), shown(creator.version()),
-                       shown(creator.platformVersion()),
+    return fmt::format("  creator: {}{}\n", shownCreator(creator),
                        isPlatform ? " (the name is the platform's: no stamp stores the creator's)" : "");
 }
 
 void print(const FileInfo& file) {
     const std::string duration = file.duration ? fmt::format("{:.3f} s", *file.duration) : "duration not told";
-    writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", withoutControls(file.name), file.container, duration,
+    writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", shown(file.name), file.container, duration,
                             bytesText(file.layout.fileSize), file.streams.size(), file.streams.size() == 1 ? "" : "s"));
     if (!file.streams.empty())
         writeOutput(heading(fmt::format("  {:<23}  {:>9}  {:>10}  {:>10}  {:>8}  {:>10}  {:>7}  {}", "kind", "entries",
@@ -79,7 +78,7 @@ void warnOf(const FileInfo& file) {
     std::vector<Finding> damage;
     std::copy_if(file.warnings.begin(), file.warnings.end(), std::back_inserter(damage), isDamage);
     for (std::size_t i = 0; i < std::min(most, damage.size()); ++i)
-        warn(fmt::format("{}: {}", file.name, findingText(damage[i])));
+        warnAbout(file.name, findingText(damage[i]));
     if (file.isDamaged)
         warn(fmt::format("{}: 'zulm verify {}' says {}", file.name, shellWord(file.name),
                          damage.size() > most ? fmt::format("{} more", damage.size() - most) : "what that means"));

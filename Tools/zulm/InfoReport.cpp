@@ -4,6 +4,8 @@
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/Text.h"
 
+#include <fmt/core.h>
+
 #include <cmath>
 
 namespace Zulm {
@@ -28,13 +30,21 @@ Json streamDocument(const StreamInfo& stream) {
     return document;
 }
 
-Json creatorDocument(const ZCAPHeader& info) {
-    return {{"name", info.creator.name()},
-            {"version", info.creator.version()},
-            {"platform_version", info.creator.platformVersion()}};
+} // namespace
+
+Json creatorDocument(const CreatorAttributes& creator) {
+    const auto [name, version, platformVersion] = creator.storedTexts();
+    Json document;
+    addText(document, "name", name);
+    addText(document, "version", version);
+    addText(document, "platform_version", platformVersion);
+    return document;
 }
 
-} // namespace
+std::string shownCreator(const CreatorAttributes& creator) {
+    const auto [name, version, platformVersion] = creator.storedTexts();
+    return fmt::format("{} {} on version {}", shown(name), shown(version), shown(platformVersion));
+}
 
 std::optional<double> entriesPerSecond(const StreamInfo& stream) {
     if (!stream.firstTime || !stream.lastTime || stream.entries < 2)
@@ -77,8 +87,8 @@ Json infoDocument(const FileInfo& file) {
                          {"warnings", Json::array()}});
     for (const StreamInfo& stream : file.streams)
         document["streams"].push_back(streamDocument(stream));
-    for (const ZCAPHeader& creator : file.creators)
-        document["creators"].push_back(creatorDocument(creator));
+    for (const ZCAPHeader& info : file.creators)
+        document["creators"].push_back(creatorDocument(info.creator));
     for (const LayoutItem& child : metaDataChildren(file.layout))
         if (child.isForeign)
             document["foreign_atoms"].push_back(

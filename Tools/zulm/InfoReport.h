@@ -33,6 +33,10 @@ std::optional<double> entriesPerSecond(const StreamInfo& stream);
 /// What is inside of the file's metadata.
 std::vector<LayoutItem> metaDataChildren(const Layout& layout);
 
+/// The texts of a creator with everything that is stored in their fields.
+nlohmann::ordered_json creatorDocument(const ZULMetaData::CreatorAttributes& creator);
+std::string shownCreator(const ZULMetaData::CreatorAttributes& creator); ///< "Mac 1.2 on version 6.1.0"
+
 /// The file's object of `zulm info --json`.
 nlohmann::ordered_json infoDocument(const FileInfo& file);
 

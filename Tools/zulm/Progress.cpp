@@ -1,6 +1,7 @@
 #include "Tools/zulm/Progress.h"
 
 #include "Tools/zulm/Settings.h"
+#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -41,8 +42,8 @@ void Progress::show(Clock::time_point now) {
     const double elapsed = std::chrono::duration<double>(now - start_).count();
     const double share = total_ == 0 ? 1 : static_cast<double>(done_) / static_cast<double>(total_);
     const double left = share > 0 ? elapsed / share - elapsed : 0;
-    const std::string line = fmt::format("\r\033[K{}: {} of {} ({:.0f} %), {:.0f} s left", what_, bytesText(done_),
-                                         bytesText(total_), share * 100, left);
+    const std::string line = fmt::format("\r\033[K{}: {} of {} ({:.0f} %), {:.0f} s left", shownMessage(what_),
+                                         bytesText(done_), bytesText(total_), share * 100, left);
     std::fputs(line.c_str(), stderr); // a terminal that is gone must not end the work
     std::fflush(stderr);
     isShown_ = true;

@@ -140,7 +140,7 @@ Json streamDocument(const RedactedStream& stream) {
 
 void report(const RedactOptions& options, const RedactedCopy& copy) {
     Json document = fileHeader(options.file);
-    document["output"] = validText(options.output);
+    addText(document, "output", options.output);
     document["streams"] = Json::array();
     for (const RedactedStream& stream : copy.streams())
         document["streams"].push_back(streamDocument(stream));

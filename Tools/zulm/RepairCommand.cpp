@@ -44,15 +44,17 @@ void print(const RepairOptions& options, const Repair& repair) {
     const std::string& name = repair.output.empty() ? options.save.movie : repair.output;
     printRepair(name, repair.plan);
     if (repair.plan.state == RepairPlan::Whole)
-        writeOutput(fmt::format("{}: nothing to repair\n", withoutControls(name)));
+        writeOutput(fmt::format("{}: nothing to repair\n", shown(name)));
     else if (repair.plan.state == RepairPlan::Repairable)
-        writeOutput(fmt::format("{}: {}\n", withoutControls(name),
+        writeOutput(fmt::format("{}: {}\n", shown(name),
                                 options.dryRun ? "would be repaired; nothing was changed" : "repaired"));
 }
 
 void report(const RepairOptions& options, const Repair& repair) {
     Json file = fileHeader(options.save.movie);
-    file["output"] = repair.output.empty() ? Json(nullptr) : Json(repair.output);
+    file["output"] = nullptr;
+    if (!repair.output.empty())
+        addText(file, "output", repair.output);
     file.update(repairDocument(repair.plan));
     printReport("repair", Json::array({file}));
 }

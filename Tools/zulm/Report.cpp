@@ -12,16 +12,24 @@ Json reportHeader(const std::string& command) {
     return {{"schema", "zulm." + command}, {"schema_version", 1}, {"tool_version", ZULM_VERSION}};
 }
 
+std::string jsonLine(const Json& document) {
+    return shownJSON(document.dump(-1, ' ', false, Json::error_handler_t::replace));
+}
+
 std::string reportText(const Json& document) {
-    return document.dump(2, ' ', false, Json::error_handler_t::replace);
+    return shownJSON(document.dump(2, ' ', false, Json::error_handler_t::replace));
 }
 
 Json fileHeader(const std::string& path) {
-    const std::string valid = validText(path);
-    Json document{{"path", valid}};
-    if (valid != path)
-        document["path_base64"] = base64(path);
+    Json document;
+    addText(document, "path", path);
     return document;
+}
+
+void addText(Json& document, const std::string& key, const std::string& bytes) {
+    document[key] = validText(bytes);
+    if (document[key] != bytes)
+        document[key + "_base64"] = base64(bytes);
 }
 
 Json numberDocument(std::optional<double> number) {

@@ -5,6 +5,7 @@
 #include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -56,20 +57,21 @@ std::vector<std::string> outputsFor(const std::vector<SalvagedStream>& streams, 
 }
 
 Json streamDocument(const SalvagedStream& stream, const std::string& output) {
-    return {{"kind", kindDocument(stream.header.uuid)},
-            {"uuid", uuidText(stream.header.uuid)},
-            {"version", stream.header.version},
-            {"found", originText(stream.origin)},
-            {"offset", stream.offset},
-            {"bytes", stream.bytes},
-            {"declared_bytes", stream.declaredBytes ? Json(*stream.declaredBytes) : Json(nullptr)},
-            {"entries", stream.entries},
-            {"cut_short", stream.isCutShort},
-            {"file", output}};
+    Json document{{"kind", kindDocument(stream.header.uuid)},
+                  {"uuid", uuidText(stream.header.uuid)},
+                  {"version", stream.header.version},
+                  {"found", originText(stream.origin)},
+                  {"offset", stream.offset},
+                  {"bytes", stream.bytes},
+                  {"declared_bytes", stream.declaredBytes ? Json(*stream.declaredBytes) : Json(nullptr)},
+                  {"entries", stream.entries},
+                  {"cut_short", stream.isCutShort}};
+    addText(document, "file", output);
+    return document;
 }
 
 void print(const SalvagedStream& stream, const std::string& output) {
-    writeOutput(fmt::format("{}: {} {}, {} bytes from offset {}, {}{}\n", output, stream.entries,
+    writeOutput(fmt::format("{}: {} {}, {} bytes from offset {}, {}{}\n", shown(output), stream.entries,
                             stream.entries == 1 ? "entry" : "entries", stream.bytes, stream.offset,
                             originText(stream.origin), stream.isCutShort ? ", cut short" : ""));
 }

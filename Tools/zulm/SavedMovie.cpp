@@ -154,7 +154,7 @@ std::string unrepairableText(const std::string& path, const RepairPlan& plan) {
 void printRepair(const std::string& path, const RepairPlan& plan) {
     if (plan.state == RepairPlan::Whole)
         return;
-    writeOutput(fmt::format("{}: {}\n", withoutControls(path), plan.finding));
+    writeOutput(fmt::format("{}: {}\n", shown(path), plan.finding));
     for (const RepairChange& change : plan.changes)
         writeOutput(fmt::format("  offset {}: {} -> {}  {}\n", change.offset, hexText(change.before),
                                 change.after.empty() ? "(cut off)" : hexText(change.after), change.reason));

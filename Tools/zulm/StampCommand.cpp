@@ -1,3 +1,4 @@
+#include "Tools/zulm/InfoReport.h"
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/StandardStreams.h"
@@ -22,21 +23,16 @@ struct StampOptions {
 void print(const StampOptions& options, const std::string& name, const StampResult& stamped) {
     const CreatorAttributes& creator = stamped.info.creator;
     printRepair(name, stamped.repair);
-    writeOutput(fmt::format("{}: stamped as {} {} on version {}\n", withoutControls(name), creator.name(),
-                            creator.version(), creator.platformVersion()));
+    writeOutput(fmt::format("{}: stamped as {}\n", shown(name), shownCreator(creator)));
     if (creator.name() != options.creator)
         writeOutput(fmt::format("  {} stands in place of {}: a movie stores the platform's name, not its creator's\n",
-                                creator.name(), withoutControls(options.creator)));
+                                shown(creator.name()), shown(options.creator)));
 }
 
 void report(const StampOptions& options, const std::string& name, const StampResult& stamped) {
-    const CreatorAttributes& creator = stamped.info.creator;
     Json file = fileHeader(options.save.movie);
-    file.update(Json{
-        {"output", name},
-        {"repair", repairDocument(stamped.repair)},
-        {"creator",
-         {{"name", creator.name()}, {"version", creator.version()}, {"platform_version", creator.platformVersion()}}}});
+    addText(file, "output", name);
+    file.update(Json{{"repair", repairDocument(stamped.repair)}, {"creator", creatorDocument(stamped.info.creator)}});
     printReport("stamp", Json::array({file}));
 }
 

@@ -1,28 +1,56 @@
 #pragma once
 
-// Stored bytes as they can be shown.
+// Stored bytes as they can be shown: nothing is invisible, and no two texts look alike.
+//
+// Characters that cannot be seen are control characters, format characters such as those that turn the direction of
+// writing, separators of lines, fillers, and numbers that no character ever has.
 
+#include <cstdint>
 #include <string>
 #include <string_view>
 
 namespace Zulm {
 
+/// One character of a text, or one byte that belongs to no character.
+struct TextPiece {
+    std::string_view bytes;
+    std::uint32_t number = 0; ///< its code point, or the value of the byte
+    bool isCharacter = false; ///< false for a byte that is not UTF-8
+    bool canBeSeen() const;
+};
+
+/// Returns what `bytes` begin with. They must not be empty.
+TextPiece firstPiece(std::string_view bytes);
+
 /// Printable ASCII as it is, all else, and the backslash, as \xNN.
 std::string printable(std::string_view bytes);
 
-/// As it is, but for control characters, which could do something to a terminal: those as \xNN. For names of files,
-/// which need not be UTF-8.
-std::string withoutControls(const std::string& bytes);
+/// Returns the text with an escape for everything that cannot be seen: \xNN for an ASCII control character and for a
+/// byte that is not UTF-8, \u{N} for any other character, and \\ for a backslash.
+std::string shown(std::string_view bytes);
 
-/// The same for text: with U+FFFD in place of what is not UTF-8.
-std::string shown(const std::string& text);
+/// The same for names of files.
+inline std::string withoutControls(std::string_view name) {
+    return shown(name);
+}
 
-/// `bytes` as they are where they are UTF-8, else with U+FFFD in place of what is not.
+/// Returns a whole message with the same escapes. Its backslashes are doubled only if they would look like an escape
+/// otherwise, so that the commands in it (see `shellWord`) can be pasted into a shell.
+std::string shownMessage(std::string_view message);
+
+/// Returns a JSON document with \uNNNN for every character in its texts that cannot be seen.
+std::string shownJSON(const std::string& document);
+
+/// Returns a text for people to read in one line: white space as spaces, [U+NNNN] for what cannot be seen.
+std::string readableLine(const std::string& text);
+
+/// `bytes` as they are if they are UTF-8, else with U+FFFD in place of what is not.
 std::string validText(const std::string& bytes);
 
-/// As one word of a command that can be pasted into a shell: as it is, or quoted.
+/// Returns one word of a command that can be pasted into a shell: as it is, or quoted. `shownMessage` leaves it alone.
 std::string shellWord(const std::string& word);
 
 std::string base64(std::string_view bytes);
+std::string bytesOfBase64(std::string_view text); ///< the inverse of `base64`
 
 } // namespace Zulm

@@ -47,16 +47,15 @@ std::string counted(std::uint64_t count, const char* one, const char* many) {
 void print(const std::string& name, const ValidationReport& report) {
     const auto findings = report.allFindings();
     for (const Finding& finding : findings)
-        writeOutput(fmt::format("{}: {}\n", withoutControls(name), findingText(finding)));
+        writeOutput(fmt::format("{}: {}\n", shown(name), findingText(finding)));
     if (const std::uint64_t unlisted = report.damageCount + report.noticeCount - findings.size(); unlisted > 0)
-        writeOutput(fmt::format("{}: {} not listed\n", withoutControls(name),
-                                counted(unlisted, "more finding is", "more findings are")));
+        writeOutput(
+            fmt::format("{}: {} not listed\n", shown(name), counted(unlisted, "more finding is", "more findings are")));
     if (!report.isDamaged() && report.hasMetaData())
-        writeOutput(fmt::format("{}: ok ({}, {})\n", withoutControls(name),
-                                counted(report.streamCount, "stream", "streams"),
+        writeOutput(fmt::format("{}: ok ({}, {})\n", shown(name), counted(report.streamCount, "stream", "streams"),
                                 counted(report.wholeEntries, "entry", "entries")));
     else if (!report.isDamaged())
-        writeOutput(fmt::format("{}: no recording metadata\n", withoutControls(name)));
+        writeOutput(fmt::format("{}: no recording metadata\n", shown(name)));
 }
 
 /// What to run next.

@@ -1,7 +1,7 @@
 #include "Tools/zulm/ViewerPage.h"
 
-#include "Tools/zulm/EntryFormat.h"
 #include "Tools/zulm/InfoReport.h"
+#include "Tools/zulm/Report.h"
 #include "Tools/zulm/Text.h"
 #include "Tools/zulm/VerifyReport.h"
 
