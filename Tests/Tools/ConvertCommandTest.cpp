@@ -158,12 +158,62 @@ TEST_F(ConvertCommand, MakesAChapterOfEveryChangeOfTitles) {
     EXPECT_THAT(converted(file, {"ffmetadata"}), HasSubstr("START=4000\nEND=20000\n")) << "the movie's end";
 }
 
+TEST_F(ConvertCommand, EndsWithTheMovie) {
+    const std::string slides = streamHeader("2b7b6af8", 1, 0) + textEntry(17.25, "Last") + textEntry(20, "At the end") +
+                               textEntry(25, "Later");
+    const std::string keystrokes =
+        streamHeader("2b7b6af5", 1, 16) + typed(19.5, "a") + typed(19.9996, "b") + typed(1e9, "c");
+    const std::string file = write("movie.mp4", tinyMovie() + zulmAtom({slides, keystrokes}));
+    const ToolResult chapters = runTool({"convert", file, "--to", "ffmetadata"});
+    EXPECT_EQ(chapters.exitCode, 3);
+    EXPECT_THAT(chapters.errors, HasSubstr("slideTitles: left out 2 entries at the end, 20 s, or after it"));
+    EXPECT_THAT(chapters.output, testing::EndsWith("START=17250\nEND=20000\ntitle=Last\n"));
+    const ToolResult captions = runTool({"convert", file, "--to", "srt", "--show-keys"});
+    EXPECT_THAT(captions.errors, HasSubstr("keyboardAction: left out 1 entry at the end"));
+    EXPECT_EQ(captions.output, "1\n00:00:19,500 --> 00:00:20,000\nab\n\n");
+}
+
+TEST_F(ConvertCommand, KeepsTheLengthOfAMovieThatFFmpegPutsChaptersAndCaptionsInto) {
+    const std::string picture = folder / "picture.mp4";
+    ASSERT_EQ(runProgram("ffmpeg", {"-v", "error", "-f", "lavfi", "-i", "color=size=16x16:rate=5:duration=4", picture})
+                  .exitCode,
+              0);
+    const std::string stream = write("keys.dat", streamHeader("2b7b6af5", 1, 16) + typed(3.75, "a"));
+    const std::string names =
+        write("names.dat", streamHeader("2b7b6af8", 1, 0) + textEntry(0, "One") + textEntry(3, "Two"));
+    ASSERT_EQ(runTool({"attach", picture, stream, names, "--in-place"}).exitCode, 0);
+    const std::string chapters = write("chapters.txt", converted(picture, {"ffmetadata"}));
+    const std::string captions = write("captions.srt", converted(picture, {"srt"}));
+    const std::string output = folder / "output.mp4";
+    const ToolResult muxed =
+        runProgram("ffmpeg", {"-v", "error", "-i", picture, "-i", chapters, "-i", captions, "-map", "0:v", "-map", "2",
+                              "-map_metadata", "1", "-c:v", "copy", "-c:s", "mov_text", output});
+    ASSERT_EQ(muxed.exitCode, 0) << muxed.errors;
+    const ToolResult duration =
+        runProgram("ffprobe", {"-v", "error", "-show_entries", "format=duration", "-of", "csv=p=0", output});
+    EXPECT_EQ(duration.output, "4.000000\n");
+}
+
+TEST_F(ConvertCommand, ShowsWhatCannotBeSeenInTitles) {
+    const std::string file = titles(textEntry(1, std::string("a\0b\xe2\x80\xae", 6)));
+    for (const char* format : {"ffmetadata", "chapters"})
+        EXPECT_THAT(converted(file, {format}), HasSubstr("=a[U+0000]b[U+202E]\n")) << format;
+    EXPECT_THAT(converted(file, {"srt", "--stream", "topmostWindowTitle"}), HasSubstr("\na[U+0000]b[U+202E]\n"));
+}
+
+TEST_F(ConvertCommand, TakesCodesForCharactersUnlessTheyAreVirtualKeys) {
+    EXPECT_THAT(converted(keys(typed(1, "hello world")), {"srt", "--show-keys"}), HasSubstr("\nhello world\n"));
+    EXPECT_THAT(converted(keys(key(1, 0x444) + key(1, 119, s_virtualKey) + key(1, 8)), {"srt", "--show-keys"}),
+                HasSubstr("\n\xd1\x84 [f8] [back]\n"));
+    EXPECT_THAT(converted(keys(key(1, 97, s_virtualKey)), {"srt"}), HasSubstr("\n" + s_bullet + "\n"));
+}
+
 TEST_F(ConvertCommand, LeavesOutWhatHasNoPlaceOnTheTimeLine) {
     const double nan = std::numeric_limits<double>::quiet_NaN();
     const std::string file = keys(typed(-1, "a") + typed(nan, "b") + typed(1e300, "c") + typed(2, "d"));
     const ToolResult result = runTool({"convert", file, "--to", "srt", "--show-keys"});
     EXPECT_EQ(result.exitCode, 3);
-    EXPECT_THAT(result.errors, HasSubstr("left out 3 entries"));
+    EXPECT_THAT(result.errors, HasSubstr("left out 2 entries before the beginning or at no time"));
     EXPECT_EQ(result.output, "1\n00:00:02,000 --> 00:00:03,500\nd\n\n");
 }
 

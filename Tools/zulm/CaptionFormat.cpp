@@ -1,5 +1,7 @@
 #include "Tools/zulm/CaptionFormat.h"
 
+#include "Tools/zulm/Text.h"
+
 #include <fmt/core.h>
 
 #include <string_view>
@@ -33,19 +35,11 @@ std::string centiseconds(std::int64_t time) {
     return fmt::format("{}:{:02}:{:02}.{:02}", clock.hours, clock.minutes, clock.seconds, clock.fraction);
 }
 
-/// White space of every kind is a space: no text ends its line.
-std::string oneLine(std::string_view text) {
-    std::string line;
-    for (const char c : text)
-        line += static_cast<unsigned char>(c) < ' ' || c == '\x7f' ? ' ' : c;
-    return line;
-}
-
 /// Every character by `escape`, which gives what stands for it.
 template <class Escape>
 std::string escaped(const std::string& text, Escape escape) {
     std::string result;
-    for (const char c : oneLine(text))
+    for (const char c : readableLine(text))
         result += escape(c);
     return result;
 }
@@ -131,7 +125,7 @@ std::string item(const PlacedCaption& caption, std::size_t number, CaptionFormat
     case CaptionFormat::Chapters: break;
     }
     return fmt::format("CHAPTER{0:02}={1}\nCHAPTER{0:02}NAME={2}\n", number, milliseconds(caption.start, '.'),
-                       oneLine(text));
+                       readableLine(text));
 }
 
 } // namespace

@@ -18,7 +18,7 @@ using namespace ZULMetaData;
 namespace {
 
 constexpr double s_hold = 1.5;       ///< seconds that a caption stays behind its last key
-constexpr double s_lastDuration = 5; ///< seconds of the last caption where nothing tells its end
+constexpr double s_lastDuration = 5; ///< seconds of the last title if the length of the movie is not known
 constexpr double s_endOfTime = 1e9;  ///< seconds: 30 years, within what every format can hold
 constexpr std::size_t s_lineLength = 42;
 
@@ -58,60 +58,33 @@ private:
     std::string names_;
 };
 
-/// The keys that the library names after what they type.
 constexpr std::uint32_t s_space = 32;
 constexpr std::string_view s_shiftedDigits = ")!@#$%^&*(";
 constexpr std::uint32_t s_firstPunctuation = 187;
 constexpr std::string_view s_punctuation = "+,-.";
 
-/// What a key types that the library has a name for; empty where it types nothing.
-std::string namedCharacter(std::uint32_t code, bool isShiftedKey) {
+/// Returns what a virtual key with a name types; empty if it types nothing.
+std::string typedByVirtualKey(std::uint32_t code, const Modifiers& modifiers) {
     if (code == s_space)
         return " ";
     if (code >= '0' && code <= '9')
-        return std::string(1, isShiftedKey ? s_shiftedDigits[code - '0'] : static_cast<char>(code));
+        return std::string(1, modifiers.has("<Shift>") ? s_shiftedDigits[code - '0'] : static_cast<char>(code));
     if (code >= s_firstPunctuation && code - s_firstPunctuation < s_punctuation.size())
         return std::string(1, s_punctuation[code - s_firstPunctuation]);
-    return {};
+    if (code < 'A' || code > 'Z')
+        return {};
+    const bool isUpperCase = modifiers.makeUpperCase() || modifiers.makeShortcut();
+    return std::string(1, static_cast<char>(isUpperCase ? code : code - 'A' + 'a'));
 }
 
-std::string utf8(std::uint32_t codePoint) {
-    const auto continuation = [codePoint](int shift) { return static_cast<char>(0x80 | (codePoint >> shift & 0x3f)); };
-    if (codePoint < 0x800)
-        return {static_cast<char>(0xc0 | codePoint >> 6), continuation(0)};
-    if (codePoint < 0x10000)
-        return {static_cast<char>(0xe0 | codePoint >> 12), continuation(6), continuation(0)};
-    return {static_cast<char>(0xf0 | codePoint >> 18), continuation(12), continuation(6), continuation(0)};
-}
-
-/// What a key types that has no name: its code is the character.
-std::string unnamedCharacter(std::uint32_t code, const std::string& name, const Modifiers& modifiers) {
-    std::string number = fmt::format("[key {}]", code);
-    if (code > 0xff) {
-        const std::string text = code < 0x110000 ? utf8(code) : std::string();
-        return isUTF8(text) && !text.empty() ? text : number;
+/// Returns what a key types; empty for a special key. A number may stand for any character.
+std::string typedBy(const KeyStroke& key, const KeyName& name, const Modifiers& modifiers) {
+    switch (name.meaning) {
+    case KeyMeaning::Character: return name.text;
+    case KeyMeaning::Number: return fmt::format("[{}]", name.text);
+    case KeyMeaning::Key: break;
     }
-    const std::string text = textFromLatin1(name);
-    const bool isControl = text.empty() || code < ' ' || (code >= 0x7f && code < 0xa0);
-    if (isControl)
-        return number;
-    const bool isLetter = code >= 'A' && code <= 'Z';
-    return isLetter && modifiers.has("(IsVK)") && !modifiers.makeUpperCase() && !modifiers.makeShortcut()
-               ? std::string(1, static_cast<char>(code - 'A' + 'a'))
-               : text;
-}
-
-/// What a key types; empty for a special key.
-std::string characterOf(const KeyStroke& key, const std::string& name, const Modifiers& modifiers) {
-    const bool hasName = name.size() > 1;
-    const bool isShiftedKey = modifiers.has("<Shift>") && modifiers.has("(IsVK)");
-    return hasName ? namedCharacter(key.characterCode, isShiftedKey)
-                   : unnamedCharacter(key.characterCode, name, modifiers);
-}
-
-/// A code that is not marked as a key's may be a character's: the f4 key has the number of the letter s.
-bool mayBeCharacter(const KeyStroke& key, const Modifiers& modifiers) {
-    return key.characterCode >= ' ' && key.characterCode != 0x7f && !modifiers.has("(IsVK)");
+    return isVirtualKey(key) ? typedByVirtualKey(key.characterCode, modifiers) : std::string();
 }
 
 std::size_t lengthOf(const std::string& text) {
@@ -147,19 +120,17 @@ private:
 
 } // namespace
 
-bool isShowable(double seconds) {
-    return seconds >= 0 && seconds < s_endOfTime;
+double endOfCaptions(std::optional<double> duration) {
+    return std::min(duration.value_or(s_endOfTime), s_endOfTime);
 }
 
 KeyLabel labelOf(const KeyStroke& key, bool showsKeys) {
     const Modifiers modifiers(key.eventFlagsCode);
-    const std::string name =
-        HumanReadableActions::KeyboardActionCodeToString(static_cast<std::int32_t>(key.characterCode));
-    const std::string character = characterOf(key, name, modifiers);
-    const bool isSpecial = character.empty() && (showsKeys || !mayBeCharacter(key, modifiers));
-    if (isSpecial)
-        return {fmt::format("{}[{}]", modifiers.signs(), name), false, name == "returnKey"};
-    const std::string shown = showsKeys ? character : s_mask;
+    const KeyName name = keyNameOf(key);
+    const std::string typed = typedBy(key, name, modifiers);
+    if (typed.empty())
+        return {fmt::format("{}[{}]", modifiers.signs(), name.text), false, name.text == "returnKey"};
+    const std::string shown = showsKeys ? typed : s_mask;
     if (modifiers.makeShortcut())
         return {modifiers.signs() + shown, false, false};
     return {shown, true, false};
@@ -175,15 +146,19 @@ std::vector<Caption> keyCaptions(std::vector<KeyEvent> keys, double pause, bool 
     return captions;
 }
 
-std::vector<PlacedCaption> placed(std::vector<Caption> captions, double unitsPerSecond, double duration) {
+std::vector<PlacedCaption> placed(std::vector<Caption> captions, double unitsPerSecond,
+                                  std::optional<double> duration) {
     std::stable_sort(captions.begin(), captions.end(),
                      [](const Caption& left, const Caption& right) { return left.start < right.start; });
+    const double lastEnd = std::floor(endOfCaptions(duration) * unitsPerSecond);
+    const auto unitsAt = [&](double seconds) {
+        return std::llround(std::min(std::round(seconds * unitsPerSecond), lastEnd));
+    };
     std::vector<PlacedCaption> result;
     for (const Caption& caption : captions) {
-        const double lastEnd = std::max(caption.start + s_lastDuration, std::min(duration, s_endOfTime));
-        const double end = std::isfinite(caption.end) ? caption.end : lastEnd;
-        const PlacedCaption next{std::llround(caption.start * unitsPerSecond), std::llround(end * unitsPerSecond),
-                                 caption.text};
+        const double end = std::isfinite(caption.end) ? caption.end : duration.value_or(caption.start + s_lastDuration);
+        const std::int64_t start = std::min(unitsAt(caption.start), std::max(std::llround(lastEnd) - 1, 0LL));
+        const PlacedCaption next{start, unitsAt(end), caption.text};
         if (!result.empty() && result.back().start == next.start) {
             result.back().text += " \xc2\xb7 " + next.text; // middle dot
             result.back().end = std::max(result.back().end, next.end);

@@ -5,6 +5,7 @@
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -22,8 +23,8 @@ struct KeyEvent {
     ZULMetaData::KeyStroke key;
 };
 
-/// Whether a caption can begin at this time: from 0 on, and not after the end of all media.
-bool isShowable(double seconds);
+/// Returns the time before which every caption begins, in seconds: the end of the movie, or of what files can hold.
+double endOfCaptions(std::optional<double> duration);
 
 /// How a keystroke is shown: what it types, or [name] of a special key, with the signs of its modifiers in front.
 struct KeyLabel {
@@ -32,8 +33,8 @@ struct KeyLabel {
     bool endsLine = false; ///< the return key
 };
 
-/// Where `showsKeys` is false, every key that types a character shows as a bullet, and so does one of which that cannot
-/// be told: only what is marked as a virtual key, and control characters, show by their names.
+/// If `showsKeys` is false, every key that types a character shows as a bullet, and so does a number without a name:
+/// only virtual keys that type nothing, and control characters, show by their names.
 KeyLabel labelOf(const ZULMetaData::KeyStroke& key, bool showsKeys);
 
 /// Keys that follow one another within `pause` seconds make one caption, up to the end of a line.
@@ -47,7 +48,8 @@ struct PlacedCaption {
 };
 
 /// Captions in the order of their times, none overlapping the next and none empty. Those that begin together become
-/// one. The last one that nothing follows ends at `duration` where that is later, or after a few seconds.
-std::vector<PlacedCaption> placed(std::vector<Caption> captions, double unitsPerSecond, double duration);
+/// one. All of them must begin before `endOfCaptions(duration)`, and end there at the latest. A title that nothing
+/// follows ends with the movie, or after a few seconds if the length of the movie is not known.
+std::vector<PlacedCaption> placed(std::vector<Caption> captions, double unitsPerSecond, std::optional<double> duration);
 
 } // namespace Zulm

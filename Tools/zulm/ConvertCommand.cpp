@@ -37,7 +37,8 @@ constexpr double s_untilTheNext = std::numeric_limits<double>::infinity();
 /// Collects what is said in the streams of one recording.
 class CaptionReader {
 public:
-    CaptionReader(const ConvertOptions& options, Recording& recording) : options_(options), recording_(recording) {}
+    CaptionReader(const ConvertOptions& options, Recording& recording, std::optional<double> duration)
+        : options_(options), recording_(recording), end_(endOfCaptions(duration)) {}
 
     void read(const HeldStream& stream) {
         RecordedKinds::visit(stream.type, [&]<class Kind>() { readKind<Kind>(stream); });
@@ -66,16 +67,22 @@ private:
     }
 
     static std::string titleOf(const std::string& stored) {
-        const std::string text = validText(stored.substr(0, stored.find('\0')));
+        const std::string text = validText(stored);
         const bool isBlank = text.find_first_not_of(" \t\r\n") == std::string::npos;
         return isBlank ? "(untitled)" : text;
     }
+
+    /// Numbers of entries that have no place on the time line.
+    struct LeftOut {
+        std::uint64_t beforeStart = 0;
+        std::uint64_t atEnd = 0;
+    };
 
     template <class Value, class Visit>
     void walk(const HeldStream& stream, Visit visit) {
         StreamEntries entries = entriesOf(recording_, stream);
         std::uint64_t end = 0;
-        std::uint64_t skipped = 0;
+        LeftOut leftOut;
         if (entries.header() && isDecodable(*entries.header())) {
             end = entries.wholeBytes();
             while (const auto entry = entries.next()) {
@@ -83,28 +90,36 @@ private:
                 if (!decoded)
                     break;
                 end = entry->end();
-                if (isShowable(decoded->time))
+                if (decoded->time >= 0 && decoded->time < end_)
                     visit(decoded->time, decoded->value);
                 else
-                    ++skipped;
+                    ++(decoded->time >= end_ ? leftOut.atEnd : leftOut.beforeStart);
             }
         }
-        complainAbout(stream, end, skipped);
+        complainAbout(stream, end, leftOut);
     }
 
-    void complainAbout(const HeldStream& stream, std::uint64_t end, std::uint64_t skipped) {
-        if (skipped > 0)
-            complain(fmt::format("{}: {}: left out {} {} whose time lies before the beginning or is none",
-                                 recording_.name(), stream.name(), skipped, skipped == 1 ? "entry" : "entries"));
+    void complainAbout(const HeldStream& stream, std::uint64_t end, const LeftOut& leftOut) {
+        complainAbout(stream, leftOut.beforeStart, "before the beginning or at no time");
+        complainAbout(stream, leftOut.atEnd, fmt::format("at the end, {} s, or after it", end_));
         if (end < stream.declared)
             complain(fmt::format("{}: {} cannot be read from offset {} on; 'zulm verify {}' says more",
                                  recording_.name(), stream.name(), stream.offset + end, shellWord(recording_.name())));
-        if (skipped > 0 || end < stream.declared)
+        if (end < stream.declared)
             code_ = ExitDamaged;
+    }
+
+    void complainAbout(const HeldStream& stream, std::uint64_t leftOut, const std::string& where) {
+        if (leftOut == 0)
+            return;
+        complain(fmt::format("{}: {}: left out {} {} {}", recording_.name(), stream.name(), leftOut,
+                             leftOut == 1 ? "entry" : "entries", where));
+        code_ = ExitDamaged;
     }
 
     const ConvertOptions& options_;
     Recording& recording_;
+    double end_;
     std::vector<Caption> captions_;
     ExitCode code_ = ExitFine;
 };
@@ -116,6 +131,13 @@ std::vector<std::string> kindsFor(const ConvertOptions& options) {
                                          : std::vector<std::string>{"keyboardAction"};
 }
 
+/// Returns nothing for a movie that tells no length, as one that was never finished.
+std::optional<double> lengthOf(Recording& recording) {
+    const std::optional<double> duration = movieDuration(recording.parser());
+    requireRead(recording.parser().getStream(), recording.name());
+    return duration && *duration > 0 ? duration : std::nullopt;
+}
+
 ExitCode runConvert(const ConvertOptions& options) {
     const InputFile input(options.file);
     Recording recording(input.path(), input.name());
@@ -123,10 +145,10 @@ ExitCode runConvert(const ConvertOptions& options) {
     const std::vector<HeldStream> streams = heldStreams(recording, kinds);
     if (streams.empty())
         return complainAboutNothing(recording, kinds);
-    CaptionReader reader(options, recording);
+    const std::optional<double> duration = lengthOf(recording);
+    CaptionReader reader(options, recording, duration);
     for (const HeldStream& stream : streams)
         reader.read(stream);
-    const double duration = movieDuration(recording.parser()).value_or(0);
     const std::string text =
         formatted(placed(reader.captions(), unitsPerSecond(options.format), duration), options.format);
     if (options.output.empty() || options.output == "-")
@@ -140,15 +162,6 @@ void requirePauseInRange(double pause) {
     if (pause < s_shortestPause || pause > s_longestPause)
         throw CLI::ValidationError(
             "--pause", fmt::format("{} is not from {} to {} seconds", pause, s_shortestPause, s_longestPause));
-}
-
-bool hasWords(const std::string& kind) {
-    bool result = false;
-    RecordedKinds::visit(typeNamed(kind), [&]<class Kind>() {
-        using Value = typename Kind::Value;
-        result = std::same_as<Value, std::string> || std::same_as<Value, KeyStroke>;
-    });
-    return result;
 }
 
 } // namespace
@@ -179,9 +192,8 @@ void addConvertCommand(CLI::App& app, Action& chosen) {
                     "zulm convert --to ffmetadata Recording.mp4 | ffmpeg -i Recording.mp4 -i - -map_metadata 1 -c copy "
                     "Chapters.mp4");
     command->callback([options, &chosen] {
-        for (const std::string& kind : options->kinds)
-            if (!hasWords(kind))
-                throw CLI::ValidationError(fmt::format("--stream {}: it holds neither keystrokes nor texts", kind));
+        requireKinds("--stream", options->kinds, "has neither keystrokes nor texts",
+                     []<class Kind>() { return OneOf<typename Kind::Value, std::string, KeyStroke>; });
         requirePauseInRange(options->pause.value_or(s_usualPause));
         chosen = [options] { return runConvert(*options); };
     });

@@ -71,6 +71,17 @@ CLI::Option* addStreamOption(CLI::App& command, std::vector<std::string>& kinds,
         ->check(CLI::Validator(checkKind, ""));
 }
 
+void requireOneOf(const std::vector<uuid>& fitting, const std::string& option, const std::vector<std::string>& kinds,
+                  const std::string& why) {
+    std::vector<std::string> names;
+    for (const uuid& type : fitting)
+        names.push_back(metaDataKindName(type));
+    for (const std::string& kind : kinds)
+        if (std::find(fitting.begin(), fitting.end(), typeNamed(kind)) == fitting.end())
+            throw CLI::ValidationError(
+                fmt::format("{} {}: {} {}; choose from {}", option, kind, kind, why, fmt::join(names, ", ")));
+}
+
 uuid typeNamed(const std::string& kind) {
     const auto registered = std::find_if(s_metaDataKinds.begin(), s_metaDataKinds.end(),
                                          [&](const MetaDataKind& candidate) { return candidate.name == kind; });

@@ -31,6 +31,23 @@ ZULMetaData::StreamEntries entriesOf(Recording& recording, const HeldStream& str
 CLI::Option* addStreamOption(CLI::App& command, std::vector<std::string>& kinds, const std::string& description,
                              const std::string& name = "--stream");
 
+/// Throws the usage error if one of these option values names none of the fitting kinds. `why` completes the sentence
+/// "KIND ...".
+void requireOneOf(const std::vector<ZULMetaData::uuid>& fitting, const std::string& option,
+                  const std::vector<std::string>& kinds, const std::string& why);
+
+/// The same with the kinds for which `isFitting.operator()<Kind>()` returns true.
+template <class Predicate>
+void requireKinds(const std::string& option, const std::vector<std::string>& kinds, const std::string& why,
+                  Predicate isFitting) {
+    std::vector<ZULMetaData::uuid> fitting;
+    ZULMetaData::RecordedKinds::forEach([&]<class Kind>() {
+        if (isFitting.template operator()<Kind>())
+            fitting.push_back(Kind::type);
+    });
+    requireOneOf(fitting, option, kinds, why);
+}
+
 /// The identifier that an option value names.
 ZULMetaData::uuid typeNamed(const std::string& kind);
 
