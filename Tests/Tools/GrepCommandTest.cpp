@@ -65,7 +65,30 @@ TEST_F(GrepCommand, SearchesEveryKindOfTextInARecording) {
     const std::string output = runTool({"grep", ".", movie()}).output;
     for (const char* kind : {"slideTitles", "slideText", "slideComment", "topmostAppName", "topmostWindowTitle"})
         EXPECT_THAT(output, HasSubstr(std::string(":") + kind + ":"));
-    EXPECT_THAT(output, testing::Not(HasSubstr("systemData")));
+    EXPECT_THAT(output, HasSubstr(":systemData:0.000000: OSVersion:1.2.3\n"));
+}
+
+TEST_F(GrepCommand, SearchesSystemDataToItsLastText) {
+    std::string texts;
+    for (const std::string text : {"1", "2", "3", "4", "fifth \xe9"})
+        texts += textEntry(0, text);
+    const std::string file =
+        write("system.dat",
+              streamHeader("2b7b6afc", 1, 0) + le32(static_cast<std::uint32_t>(4 + texts.size())) + le32(5) + texts);
+    const ToolResult result = runTool({"grep", "\xc3\xa9", file});
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_THAT(result.output, HasSubstr(": fifth \xc3\xa9\n"));
+}
+
+TEST_F(GrepCommand, RefusesKindsWithoutTexts) {
+    for (const char* kind :
+         {"cursorLocation", "keyboardAction", "caretPosition", "2b7b6af2-7a1f-11e2-83d0-0017f200be7f"}) {
+        const ToolResult result = runTool({"grep", ".", movie(), "--stream", kind});
+        EXPECT_EQ(result.exitCode, 2) << kind;
+        EXPECT_EQ(result.output, "");
+        EXPECT_THAT(result.errors, HasSubstr("has no text to search; choose from slideTitles, slideText, slideComment, "
+                                             "systemData, topmostAppName, topmostWindowTitle"));
+    }
 }
 
 TEST_F(GrepCommand, SearchesOnlyTheChosenKinds) {
@@ -97,7 +120,17 @@ TEST_F(GrepCommand, SaysWhatCouldNotBeSearched) {
 TEST_F(GrepCommand, ShowsTextsThatAreNotUTF8OrWouldMoveTheTerminal) {
     const ToolResult result = runTool({"grep", "Not", named("Not\xff\x1b[2Jes")});
     EXPECT_EQ(result.exitCode, 0);
-    EXPECT_THAT(result.output, HasSubstr("Not\xef\xbf\xbd\\x1b[2Jes"));
+    EXPECT_THAT(result.output, HasSubstr("Not\\xff\\x1b[2Jes"));
+}
+
+TEST_F(GrepCommand, SearchesAndShowsWhatFollowsAZeroByte) {
+    const std::string file = named(std::string("Not\0es \xff", 8));
+    const ToolResult result = runTool({"grep", "es", file});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_THAT(result.output, HasSubstr(": Not\\x00es \\xff\n"));
+    const Json match = Json::parse(runTool({"grep", "es", file, "--json"}).output)["files"][0]["matches"][0];
+    EXPECT_EQ(match["text"], std::string("Not\0es \xef\xbf\xbd", 10));
+    EXPECT_EQ(match["text_base64"], "Tm90AGVzIP8=");
 }
 
 TEST_F(GrepCommand, TakesNoLongerForAnExpressionMeantToHang) {

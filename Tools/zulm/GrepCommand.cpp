@@ -7,7 +7,9 @@
 
 #include <fmt/core.h>
 
+#include <list>
 #include <memory>
+#include <utility>
 
 namespace Zulm {
 
@@ -25,6 +27,9 @@ struct GrepOptions {
     bool json = false;
 };
 
+template <class Kind>
+constexpr bool holdsTexts = OneOf<typename Kind::Value, std::string, std::list<std::string>>;
+
 /// A search through the texts of one file.
 class Search {
 public:
@@ -38,8 +43,8 @@ public:
     ExitCode run() {
         for (const HeldStream& stream : heldStreams(recording_, options_.kinds))
             RecordedKinds::visit(stream.type, [&]<class Kind>() {
-                if constexpr (std::same_as<typename Kind::Value, std::string>)
-                    search(stream);
+                if constexpr (holdsTexts<Kind>)
+                    search<typename Kind::Value>(stream);
             });
         if (isDamaged_)
             return ExitDamaged;
@@ -49,11 +54,12 @@ public:
     const Json& document() const { return document_; }
 
 private:
+    template <class Value>
     void search(const HeldStream& stream) {
         StreamEntries entries = entriesOf(recording_, stream);
         std::uint64_t end = 0;
         if (entries.header() && isDecodable(*entries.header()))
-            end = searchEntries(stream, entries);
+            end = searchEntries<Value>(stream, entries);
         if (end == stream.declared)
             return;
         isDamaged_ = true;
@@ -61,27 +67,36 @@ private:
                              stream.name(), stream.offset + end, shellWord(input_.name())));
     }
 
-    /// Gives how many bytes of the stream were searched.
+    /// Returns the number of bytes that were searched.
+    template <class Value>
     std::uint64_t searchEntries(const HeldStream& stream, StreamEntries& entries) {
         while (const auto entry = entries.next()) {
-            const auto decoded = decodeEntry<std::string>(entries.bytesOf(*entry), entries.header()->version);
+            const auto decoded = decodeEntry<Value>(entries.bytesOf(*entry), entries.header()->version);
             if (!decoded)
                 return entry->offset;
-            const std::string text = validText(decoded->value);
-            if (pattern_.matches(text))
-                report(stream, decoded->time, text);
+            searchTexts(stream, decoded->time, decoded->value);
         }
         return entries.wholeBytes();
     }
 
+    void searchTexts(const HeldStream& stream, double time, const std::string& text) {
+        if (pattern_.matches(validText(text)))
+            report(stream, time, text);
+    }
+
+    void searchTexts(const HeldStream& stream, double time, const std::list<std::string>& texts) {
+        for (const std::string& text : texts)
+            searchTexts(stream, time, utf8FromLatin1(text));
+    }
+
     void report(const HeldStream& stream, double time, const std::string& text) {
         ++matches_;
-        if (options_.json)
-            document_["matches"].push_back(
-                {{"stream", stream.name()}, {"timestamp", numberDocument(time)}, {"text", text}});
-        else
-            writeOutput(
-                fmt::format("{}:{}:{:.6f}: {}\n", withoutControls(input_.name()), stream.name(), time, shown(text)));
+        if (!options_.json)
+            return writeOutput(
+                fmt::format("{}:{}:{:.6f}: {}\n", shown(input_.name()), stream.name(), time, shown(text)));
+        Json match{{"stream", stream.name()}, {"timestamp", numberDocument(time)}};
+        addText(match, "text", text);
+        document_["matches"].push_back(std::move(match));
     }
 
     const GrepOptions& options_;
@@ -121,17 +136,19 @@ ExitCode runGrep(const GrepOptions& options) {
 void addGrepCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<GrepOptions>();
     CLI::App* command = app.add_subcommand(
-        "grep", "Search titles, slides, comments and application names of many recordings. Ends with 0 where something "
-                "matches, with 4 where nothing does, and with 1 where a file could not be read");
+        "grep", "Search titles, slides, comments, application names and system data of many recordings. Ends with 0 if "
+                "something matches, with 4 if nothing does, and with 1 if a file could not be read");
     command->add_option("PATTERN", options->pattern, "A regular expression, as RE2 has them")->required();
     command->add_option("FILE", options->files, "Movies, RIFF files or stream files; - is standard input")->required();
     command->add_flag("-i,--ignore-case", options->ignoreCase, "Upper and lower case are the same");
     command->add_flag("-F,--fixed-strings", options->isFixed, "PATTERN is a text, not an expression");
-    addStreamOption(*command, options->kinds, "Only this kind, such as topmostWindowTitle (repeatable)");
+    addStreamOption(*command, options->kinds, "Only this kind of texts, such as topmostWindowTitle (repeatable)");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm grep -i budget *.mp4\n"
                     "zulm grep --stream topmostAppName '^Mail$' Recording.mp4");
     command->callback([options, &chosen] {
+        requireKinds("--stream", options->kinds, "has no text to search",
+                     []<class Kind>() { return holdsTexts<Kind>; });
         const TextPattern checked(options->pattern, options->ignoreCase, options->isFixed);
         chosen = [options] { return runGrep(*options); };
     });
