@@ -35,7 +35,8 @@ ZulmColumn EntryColumn::view() const {
     ZulmColumn column{name_, type_, nullptr, values_.pool().data(), values_.ends().data(), values_.ends().size()};
     switch (type_) {
     case ZulmInt32: column.values = numbers_.data(); break;
-    case ZulmInt64: column.values = identifiers_.data(); break;
+    case ZulmUInt32: column.values = unsignedNumbers_.data(); break;
+    case ZulmUInt64: column.values = identifiers_.data(); break;
     case ZulmReal: column.values = reals_.data(); break;
     case ZulmTexts:
     case ZulmBytes: column.values = values_.indices().data(); break;

@@ -4,13 +4,11 @@
 
 #include "Bindings/JavaScript/zulmetadata_c.h"
 #include "ZULMetaData/ZULMMetaDataCommon.h"
-#include "ZULMetaDataBridge/Source/EntryDictionary.h"
 
 #include <cstdint>
 #include <string>
 #include <string_view>
 #include <unordered_map>
-#include <variant>
 #include <vector>
 
 namespace ZULMetaData::Bindings {
@@ -38,10 +36,10 @@ public:
     EntryColumn(const char* name, ZulmColumnType type) : name_(name), type_(type) {}
 
     void add(std::int32_t value) { numbers_.push_back(value); }
-    void add(std::uint32_t value) { numbers_.push_back(static_cast<std::int32_t>(value)); }
-    void add(std::uint64_t value) { identifiers_.push_back(static_cast<std::int64_t>(value)); }
+    void add(std::uint32_t value) { unsignedNumbers_.push_back(value); }
+    void add(std::uint64_t value) { identifiers_.push_back(value); }
     void add(float value);
-    void add(double value) { add(static_cast<float>(value)); } ///< narrowed, as in every list of entries
+    void add(double value) { reals_.push_back(value); }
     void add(const std::string& text);
     void add(const CursorImage& cursor); ///< its encoded image
 
@@ -52,7 +50,8 @@ private:
     const char* name_;
     ZulmColumnType type_;
     std::vector<std::int32_t> numbers_;
-    std::vector<std::int64_t> identifiers_;
+    std::vector<std::uint32_t> unsignedNumbers_;
+    std::vector<std::uint64_t> identifiers_;
     std::vector<double> reals_;
     DistinctValues values_;
 };

@@ -21,7 +21,7 @@ export interface StreamSummary {
 }
 
 /** One value for each entry. Texts and bytes that are equal share one object. */
-export type Column = Float64Array | Int32Array | BigInt64Array | Uint32Array | string[] | (Uint8Array | null)[];
+export type Column = Float64Array | Int32Array | Uint32Array | BigUint64Array | string[] | (Uint8Array | null)[];
 
 /** The entries of a stream, by columns. */
 export interface Entries {
@@ -30,11 +30,12 @@ export interface Entries {
   /** The times in seconds, as they are stored. */
   time: Float64Array;
   /**
-   * The values, by the names that `zulm dump` uses and in its order.
+   * The values, by the names that `zulm dump` uses and in its order, as `zulm dump --format json` prints them.
    *
-   * Whole numbers are an Int32Array, identifiers of cursor images a BigInt64Array, and other numbers a Float64Array with
-   * the values that `zulm dump --format json` prints. Texts are always valid: U+FFFD takes the place of bytes that are
-   * not UTF-8, and a missing text is empty. An image is the stored PNG or TIFF file, or null if the entry has none.
+   * Whole numbers are an Int32Array, codes and flags of keys a Uint32Array, identifiers of cursor images a
+   * BigUint64Array, and other numbers a Float64Array. Texts are whole and always valid: U+FFFD takes the place of bytes
+   * that are not UTF-8, and a missing text is empty. An image is the stored PNG or TIFF file, or null if the entry has
+   * none.
    */
   columns: Record<string, Column>;
 }

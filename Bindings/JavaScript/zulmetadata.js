@@ -10,10 +10,10 @@ export class ZulmError extends Error {
 // As zulmetadata_c.h and WasmHost.cpp have them.
 const StreamField = { kind: 0, uuid: 4, version: 8, entries: 16, bytes: 24, offset: 32, first: 40, last: 48, isKnown: 56 };
 const ColumnField = { name: 0, type: 4, values: 8, pool: 12, ends: 16, distinct: 20 };
-const ColumnType = { Int32: 0, Int64: 1, Real: 2, Texts: 3, Bytes: 4 };
+const ColumnType = { Int32: 0, UInt64: 1, Real: 2, Texts: 3, Bytes: 4, UInt32: 5 };
 const NOTHING = 0xffffffff;
 
-const utf8 = new TextDecoder();
+const utf8 = new TextDecoder('utf-8', { ignoreBOM: true }); // a text keeps its first character
 
 let compiled; // once for all recordings
 
@@ -181,8 +181,10 @@ class Core {
     switch (field(ColumnField.type)) {
       case ColumnType.Int32:
         return [name, this.copied(Int32Array, values, count)];
-      case ColumnType.Int64:
-        return [name, this.copied(BigInt64Array, values, count)];
+      case ColumnType.UInt32:
+        return [name, this.copied(Uint32Array, values, count)];
+      case ColumnType.UInt64:
+        return [name, this.copied(BigUint64Array, values, count)];
       case ColumnType.Real:
         return [name, this.copied(Float64Array, values, count)];
       case ColumnType.Texts:

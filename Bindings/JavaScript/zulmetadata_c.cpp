@@ -3,13 +3,13 @@
 #include "Bindings/JavaScript/EntryColumns.h"
 #include "Bindings/JavaScript/SliceBuffer.h"
 #include "Tools/zulm/DumpDocument.h"
-#include "Tools/zulm/EntryFormat.h"
 #include "Tools/zulm/InfoReport.h"
 #include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/Text.h"
 #include "Tools/zulm/VerifyReport.h"
 #include "ZULMetaData/ContainerRecognition.h"
+#include "ZULMetaDataBridge/Source/StoredFields.h"
 
 #include <fmt/core.h>
 
@@ -144,12 +144,14 @@ void fillIn(ZulmRecording& opened) {
 /// The type of the column that a field of this type fills.
 template <class Value>
 constexpr ZulmColumnType columnType() {
-    if constexpr (std::same_as<Value, EntryValue>)
-        return ZulmBytes; // a cursor image
+    if constexpr (std::same_as<Value, CursorImage>)
+        return ZulmBytes; // its image
     else if constexpr (std::same_as<Value, std::string>)
         return ZulmTexts;
     else if constexpr (std::same_as<Value, std::uint64_t>)
-        return ZulmInt64;
+        return ZulmUInt64;
+    else if constexpr (std::same_as<Value, std::uint32_t>)
+        return ZulmUInt32;
     else
         return std::integral<Value> ? ZulmInt32 : ZulmReal;
 }
@@ -161,40 +163,20 @@ public:
     using Value = typename Kind::Value;
 
     explicit EntryCollector(ZulmEntries& entries) : entries_(entries) {
-        const auto addColumn = [&]<class Projection>(const Field<Projection>& field) {
-            entries.columns.emplace_back(field.key, columnType<FieldValue<Field<Projection>>>());
-        };
-        std::apply([&](const auto&... field) { (addColumn(field), ...); }, Kind::fields);
+        ZULMetaData::detail::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
+            entries.columns.emplace_back(key, columnType<Stored>());
+        });
     }
 
     bool dataRead(double time, const Value& value) override {
         entries_.times.push_back(time);
-        if constexpr (std::same_as<Value, std::string>)
-            addFields(Zulm::validText(value));
-        else if constexpr (std::same_as<Value, std::list<std::string>>)
-            addFields(Zulm::filledUp<Kind>(value));
-        else
-            addFields(value);
+        auto column = entries_.columns.begin();
+        ZULMetaData::detail::visitStoredFields<Kind>(
+            value, [&column](const char*, const auto& stored) { (column++)->add(stored); });
         return true;
     }
 
 private:
-    template <class Field>
-    using FieldValue = std::remove_cvref_t<decltype(std::invoke(std::declval<Field>().valueOf, std::declval<Value>()))>;
-
-    void addFields(const Value& value) {
-        auto column = entries_.columns.begin();
-        std::apply([&](const auto&... field) { (addField(*column++, field, value), ...); }, Kind::fields);
-    }
-
-    template <class Projection>
-    static void addField(EntryColumn& column, const Field<Projection>& field, const Value& value) {
-        if constexpr (std::same_as<FieldValue<Field<Projection>>, EntryValue>)
-            column.add(value); // as it is stored
-        else
-            column.add(std::invoke(field.valueOf, value));
-    }
-
     ZulmEntries& entries_;
 };
 

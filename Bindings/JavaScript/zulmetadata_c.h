@@ -69,11 +69,12 @@ size_t zulm_hidden_count(const ZulmRecording* recording);
 const ZulmStream* zulm_hidden(const ZulmRecording* recording, size_t index);
 
 typedef enum {
-    ZulmInt32 = 0, /* int32_t */
-    ZulmInt64 = 1, /* int64_t */
-    ZulmReal = 2,  /* double */
-    ZulmTexts = 3, /* uint32_t, the number of a text among the distinct ones, in UTF-8 */
-    ZulmBytes = 4  /* the same for bytes, or ZulmNothing */
+    ZulmInt32 = 0,  /* int32_t */
+    ZulmUInt64 = 1, /* uint64_t */
+    ZulmReal = 2,   /* double */
+    ZulmTexts = 3,  /* uint32_t, the number of a text among the distinct ones, in UTF-8 */
+    ZulmBytes = 4,  /* the same for bytes, or ZulmNothing */
+    ZulmUInt32 = 5  /* uint32_t */
 } ZulmColumnType;
 
 #define ZulmNothing UINT32_MAX

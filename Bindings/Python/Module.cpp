@@ -233,10 +233,8 @@ void addReading(py::module_& module) {
 }
 
 /// A key without a name is the character of its low 8 bits.
-py::str keyText(std::uint32_t code) {
-    const std::string text = HumanReadableActions::KeyboardActionCodeToString(static_cast<std::int32_t>(code));
-    return py::reinterpret_steal<py::str>(
-        PyUnicode_DecodeLatin1(text.data(), static_cast<py::ssize_t>(text.size()), nullptr));
+std::string keyText(std::uint32_t code, std::uint32_t flags) {
+    return keyNameOf({code, flags}).text;
 }
 
 void addKinds(py::module_& module) {
@@ -255,7 +253,9 @@ void addKinds(py::module_& module) {
         "Returns the names of all kinds that have entries.");
     module.def("action_text", &HumanReadableActions::CursorActionToString, py::arg("action"),
                "Returns a text such as \"left down + shift\" for a \"rawActionValue\" of cursorAction.");
-    module.def("key_text", keyText, py::arg("code"), "The name of a key, for \"characterCode\" of keyboardAction.");
+    module.def("key_text", keyText, py::arg("code"), py::arg("flags") = 0,
+               "Returns the name of a key, for \"characterCode\" and \"eventFlagsCode\" of keyboardAction. Without the flag "
+               "(IsVK) the code is that of a character.");
     module.def(
         "modifiers_text",
         [](std::uint32_t flags) {

@@ -134,8 +134,8 @@ TEST_F(CInterface, GivesCursorImagesAsTheyAreStored) {
     EXPECT_THAT(textOf(entries.get(), 0, 0), testing::StartsWith("\x89PNG"));
     EXPECT_THAT(source_.bytes, HasSubstr(textOf(entries.get(), 0, 0)));
     EXPECT_EQ(textOf(entries.get(), 0, zulm_entry_count(entries.get()) - 1), "(nothing)");
-    EXPECT_EQ(zulm_column(entries.get(), 1)->type, ZulmInt64);
-    EXPECT_EQ(valuesOf<std::int64_t>(entries.get(), 1).front(), 11);
+    EXPECT_EQ(zulm_column(entries.get(), 1)->type, ZulmUInt64);
+    EXPECT_EQ(valuesOf<std::uint64_t>(entries.get(), 1).front(), 11);
 }
 
 TEST_F(CInterface, GivesRealNumbersWithTheDigitsThatTellThem) {

@@ -62,7 +62,7 @@ test('gives columns of the types that are promised', async () => {
   assert.deepEqual(types('slideTitles'), { title: 'Array' });
   assert.deepEqual(types('cursorImage'), {
     image: 'Array',
-    id: 'BigInt64Array',
+    id: 'BigUint64Array',
     hotspotOffsetX: 'Int32Array',
     hotspotOffsetY: 'Int32Array',
   });

@@ -149,5 +149,6 @@ def test_a_file_without_metadata_is_an_empty_recording(plain_movie):
 
 def test_texts_for_input_actions():
     assert zulmetadata.action_text(1 + 16 + 128) == "left down + shift + cmd"
-    assert zulmetadata.key_text(32) == "space" and zulmetadata.key_text(0xE9) == "é"
+    assert [zulmetadata.key_text(code) for code in (13, ord("w"), 0xE9, 0x444)] == ["returnKey", "w", "é", "ф"]
+    assert [zulmetadata.key_text(code, 0x40000000) for code in (32, 119, 200)] == ["space", "f8", "key 200"]
     assert zulmetadata.modifiers_text(0x00120000) == "<Shift><Cmd>"

@@ -52,34 +52,26 @@ function signs(key: Key): string {
   return modifierSigns.map(([name, sign]) => (has(key, name) ? sign : '')).join('');
 }
 
-/// What a key types that has a name.
-function namedCharacter(key: Key): string {
+/// What a virtual key with a name types; empty if it types nothing.
+function typedByVirtualKey(key: Key): string {
   if (key.name === 'space') return ' ';
   const digit = key.code - 48;
-  if (digit >= 0 && digit <= 9)
-    return has(key, '<Shift>') && has(key, '(IsVK)') ? shiftedDigits[digit]! : String(digit);
-  return punctuation[key.name] ?? '';
-}
-
-function unnamedCharacter(key: Key): string {
-  const number = `[key ${key.code}]`;
-  if (key.code > 0xff)
-    return key.code < 0x110000 && (key.code < 0xd800 || key.code > 0xdfff) ? String.fromCodePoint(key.code) : number;
-  if (key.code <= 32 || (key.code >= 0x7f && key.code < 0xa0)) return number;
-  const text = String.fromCharCode(key.code);
-  const isLetter = text >= 'A' && text <= 'Z';
+  if (digit >= 0 && digit <= 9) return has(key, '<Shift>') ? shiftedDigits[digit]! : String(digit);
+  if (!/^[A-Z]$/.test(key.name)) return punctuation[key.name] ?? '';
   const isUpper = has(key, '<Shift>') !== has(key, '<Alpha>');
-  return isLetter && has(key, '(IsVK)') && !isUpper && !isShortcut(key) ? text.toLowerCase() : text;
+  return isUpper || isShortcut(key) ? key.name : key.name.toLowerCase();
 }
 
-/// A code that is not marked as a key's may be a character's.
-function mayBeCharacter(key: Key): boolean {
-  return key.code >= 32 && key.code !== 0x7f && !has(key, '(IsVK)');
+/// What a key types; empty for a special key. A number may stand for any character.
+function typedBy(key: Key): string {
+  if (key.name.startsWith('key ')) return `[${key.name}]`;
+  if (has(key, '(IsVK)')) return typedByVirtualKey(key);
+  return [...key.name].length === 1 ? key.name : '';
 }
 
 export function labelOf(key: Key, showsKeys: boolean): KeyLabel {
-  const character = key.name.length > 1 ? namedCharacter(key) : unnamedCharacter(key);
-  if (!character && (showsKeys || !mayBeCharacter(key)))
+  const character = typedBy(key);
+  if (!character)
     return { text: `${signs(key)}[${key.name}]`, isTyped: false, endsLine: key.name === 'returnKey' };
   const shown = showsKeys ? character : mask;
   return isShortcut(key)
@@ -89,7 +81,7 @@ export function labelOf(key: Key, showsKeys: boolean): KeyLabel {
 
 export function keyLabel(track: Track, index: number, showsKeys: boolean): KeyLabel {
   const key = {
-    code: track.number('characterCode', index) >>> 0,
+    code: track.number('characterCode', index),
     name: track.text('characterString', index),
     modifiers: track.text('eventFlagsString', index),
   };
