@@ -26,6 +26,7 @@ inline constexpr std::uint32_t s_streamAtom = fourCC("DATA");
 inline constexpr std::uint32_t s_recordingInfoAtom = fourCC("ZULR");
 inline constexpr std::uint32_t s_spareAtom = fourCC("wide");
 inline constexpr std::uint32_t s_freeAtom = fourCC("free");
+inline constexpr std::uint32_t s_fragmentIndexAtom = fourCC("mfra");
 
 /// A chunk whose data nobody reads.
 inline constexpr std::uint32_t s_junkChunk = fourCC("JUNK");

@@ -2,9 +2,12 @@
 
 #include "ZULMetaData/AtomFormat.h"
 #include "ZULMetaData/PositionedInput.h"
+#include "ZULMetaData/WideRIFF.h"
 
 #include <cstring>
 #include <limits>
+#include <optional>
+#include <system_error>
 
 namespace ZULMetaData {
 
@@ -51,6 +54,11 @@ bool readChunk(detail::PositionedInput& input, ContainerItem& chunk) {
     chunk.size = chunk.headerSize + size;
     chunk.sizeField = size;
     return true;
+}
+
+/// Where the next chunk begins.
+std::uint64_t behindChunk(const ContainerItem& chunk) {
+    return chunk.end() + chunk.size % 2;
 }
 
 /// `endOf` gives where the next item begins.
@@ -104,10 +112,33 @@ void visitAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end, st
 
 void visitChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
                  const ContainerVisitor& visit) {
-    visitItems(
-        inputAt(stream, begin, total), end, readChunk,
-        [](const ContainerItem& chunk) { return chunk.end() + chunk.size % 2; }, visit);
+    visitItems(inputAt(stream, begin, total), end, readChunk, behindChunk, visit);
 }
+
+namespace {
+
+/// The first chunk of a RIFF file may not have its size in its header.
+void visitTopChunks(std::istream& stream, std::uint64_t total, const ContainerVisitor& visit) {
+    std::optional<detail::WideRIFF> wide;
+    try {
+        wide = detail::wideRIFF(stream);
+    } catch (const std::system_error&) {
+        stream.setstate(std::ios_base::badbit); // as a walk that cannot read leaves it
+        return;
+    }
+    const auto read = [&](detail::PositionedInput& input, ContainerItem& chunk) {
+        if (!readChunk(input, chunk))
+            return false;
+        if (wide && chunk.offset == 0) {
+            chunk.size = wide->end;
+            chunk.sizeSource = wide->isDeclared ? ContainerItem::SizeChunk : ContainerItem::FileEnd;
+        }
+        return true;
+    };
+    visitItems(inputAt(stream, 0, total), s_anywhere, read, behindChunk, visit);
+}
+
+} // namespace
 
 void visitTopLevel(std::istream& stream, MetaDataParser::StreamType type, const ContainerVisitor& visit) {
     stream.clear();
@@ -117,7 +148,7 @@ void visitTopLevel(std::istream& stream, MetaDataParser::StreamType type, const 
     if (type == MetaDataParser::QuickTime)
         visitAtoms(stream, 0, s_anywhere, total, visit);
     else if (type == MetaDataParser::Riff)
-        visitChunks(stream, 0, s_anywhere, total, visit);
+        visitTopChunks(stream, total, visit);
 }
 
 std::vector<ContainerItem> listAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end,

@@ -25,6 +25,14 @@ struct ZULMETADATA_API ContainerItem {
     /// metadata reads a 64-bit size behind every number below 8, which is then `size`.
     std::uint32_t sizeField = 0;
 
+    /// Who tells the size, if the header does not.
+    enum SizeSource : std::int32_t {
+        Header,
+        SizeChunk, ///< the `ds64` chunk inside of an `RF64` or `BW64` chunk
+        FileEnd,   ///< the end of the file or the metadata at it: the RIFF file was written to a pipe
+    };
+    SizeSource sizeSource = Header;
+
     bool isExtended() const;    ///< its size stands in 64 bits behind its type
     bool holdsMetaData() const; ///< by its type; at the top of a container it is the one whose children are streams
     bool holdsStream() const;   ///< by its type

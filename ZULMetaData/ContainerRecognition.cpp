@@ -1,15 +1,50 @@
 #include "ZULMetaData/ContainerRecognition.h"
 
 #include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/StreamExtent.h"
 
 #include <algorithm>
+#include <array>
 #include <cstring>
 
 namespace ZULMetaData {
 
 namespace {
 
-constexpr std::string_view s_riffSignature = "RIFF";
+constexpr std::array<std::string_view, 3> s_riffSignatures{"RIFF", "RF64", "BW64"};
+
+/// What movies begin with. Any other printable type may be the beginning of a text.
+constexpr std::array<std::string_view, 20> s_firstAtoms{"ftyp", "styp", "moov", "moof", "mdat", "free", "skip",
+                                                        "wide", "pnot", "sidx", "ssix", "prft", "emsg", "uuid",
+                                                        "meta", "mfra", "udta", "pdin", "ZULM", "ZULR"};
+
+struct ForeignSignature {
+    std::string_view bytes;
+    std::string_view name;
+};
+
+using namespace std::string_view_literals;
+
+constexpr std::array s_foreignSignatures{
+    ForeignSignature{"OggS"sv, "an Ogg file"},
+    ForeignSignature{"FLV\x01"sv, "an FLV file"},
+    ForeignSignature{"\x30\x26\xb2\x75\x8e\x66\xcf\x11"sv, "an ASF file (WMV or WMA)"},
+    ForeignSignature{"\0\0\1\xba"sv, "an MPEG program stream"},
+    ForeignSignature{"\0\0\1\xb3"sv, "an MPEG video stream"},
+    ForeignSignature{"\x06\x0e\x2b\x34\x02\x05\x01\x01"sv, "an MXF file"},
+    ForeignSignature{"RIFX"sv, "a big-endian RIFF file (RIFX)"},
+    ForeignSignature{"riff\x2e\x91\xcf\x11"sv, "a Wave64 file"},
+    ForeignSignature{"FORM"sv, "an IFF file (such as AIFF)"},
+    ForeignSignature{"caff"sv, "a CAF file"},
+    ForeignSignature{".snd"sv, "an AU file"},
+    ForeignSignature{".RMF"sv, "a RealMedia file"},
+    ForeignSignature{"DKIF"sv, "an IVF file"},
+    ForeignSignature{"fLaC"sv, "a FLAC file"},
+    ForeignSignature{"ID3"sv, "an MP3 file"},
+    ForeignSignature{"GIF8"sv, "a GIF image"},
+    ForeignSignature{"\x89PNG"sv, "a PNG image"},
+    ForeignSignature{"\xff\xd8\xff"sv, "a JPEG image"},
+};
 
 /// All identifiers share everything but their first group.
 bool beginsLikeStream(std::string_view bytes) {
@@ -19,16 +54,86 @@ bool beginsLikeStream(std::string_view bytes) {
     return std::memcmp(bytes.data() + firstGroup, s_cursorImageUUID.data + firstGroup, sizeof(uuid) - firstGroup) == 0;
 }
 
-bool beginsLikeAtom(std::string_view bytes) {
-    if (bytes.size() < detail::s_atomHeaderSize)
-        return false;
+bool beginsLikeRIFF(std::string_view bytes) {
+    return bytes.size() >= detail::s_chunkHeaderSize &&
+           std::any_of(s_riffSignatures.begin(), s_riffSignatures.end(),
+                       [&](std::string_view signature) { return bytes.starts_with(signature); });
+}
+
+/// The type and the 32-bit size of the atom that `bytes` begin with, if they are long enough.
+struct FirstAtom {
+    explicit FirstAtom(std::string_view bytes) : isThere(bytes.size() >= detail::s_atomHeaderSize) {
+        if (!isThere)
+            return;
+        std::memcpy(&size, bytes.data(), sizeof size);
+        size = swapInt(size);
+        type = bytes.substr(sizeof size, sizeof size);
+    }
+
+    bool hasSize() const {
+        return isThere && (size >= detail::s_atomHeaderSize || size == 0 || size == detail::s_extendedSizeMarker);
+    }
+    bool isPrintable() const {
+        return isThere && std::all_of(type.begin(), type.end(), [](char c) { return c >= ' ' && c <= '~'; });
+    }
+    bool isKnown() const { return std::find(s_firstAtoms.begin(), s_firstAtoms.end(), type) != s_firstAtoms.end(); }
+
+    bool isThere;
     std::uint32_t size = 0;
-    std::memcpy(&size, bytes.data(), sizeof size);
-    size = swapInt(size);
-    const std::string_view type = bytes.substr(sizeof size, sizeof size);
-    const auto isPrintable = [](char c) { return c >= ' ' && c <= '~'; };
-    const bool isOpenOrExtended = size == 0 || size == detail::s_extendedSizeMarker;
-    return (size >= detail::s_atomHeaderSize || isOpenOrExtended) && std::all_of(type.begin(), type.end(), isPrintable);
+    std::string_view type;
+};
+
+std::string_view matroskaName(std::string_view bytes) {
+    if (!bytes.starts_with("\x1a\x45\xdf\xa3"))
+        return {};
+    return bytes.find("webm") < s_recognitionBytes ? "a WebM file" : "a Matroska file";
+}
+
+/// Packets of 188 bytes begin with the same byte; some files have four more before each.
+bool isTransportStream(std::string_view bytes) {
+    constexpr std::size_t packet = 188;
+    for (const std::size_t extra : {std::size_t{0}, std::size_t{4}}) {
+        bool isOne = bytes.size() > extra + 2 * (packet + extra);
+        for (std::size_t i = 0; isOne && i < 3; ++i)
+            isOne = bytes[extra + i * (packet + extra)] == 'G';
+        if (isOne)
+            return true;
+    }
+    return false;
+}
+
+std::string_view foreignNameOf(std::string_view bytes) {
+    if (const std::string_view matroska = matroskaName(bytes); !matroska.empty())
+        return matroska;
+    const auto found = std::find_if(s_foreignSignatures.begin(), s_foreignSignatures.end(),
+                                    [&](const ForeignSignature& foreign) { return bytes.starts_with(foreign.bytes); });
+    if (found != s_foreignSignatures.end())
+        return found->name;
+    return isTransportStream(bytes) ? "an MPEG transport stream" : std::string_view();
+}
+
+/// What bytes are that nothing but this library or a movie begins with.
+MetaDataParser::StreamType unmistakableType(std::string_view bytes) {
+    if (beginsLikeStream(bytes))
+        return MetaDataParser::RawStream;
+    if (beginsLikeRIFF(bytes))
+        return MetaDataParser::Riff;
+    const FirstAtom atom(bytes);
+    return atom.hasSize() && atom.isKnown() ? MetaDataParser::QuickTime : MetaDataParser::Unknown;
+}
+
+/// The type of a file whose first bytes say little.
+MetaDataParser::StreamType typeByName(std::string_view bytes, std::uint64_t fileSize,
+                                      MetaDataParser::StreamType named) {
+    const FirstAtom atom(bytes);
+    switch (named) {
+    case MetaDataParser::RawStream: return named;
+    case MetaDataParser::Riff: return atom.isThere ? MetaDataParser::Unknown : named;
+    case MetaDataParser::QuickTime: return !atom.isThere || atom.isPrintable() ? named : MetaDataParser::Unknown;
+    default: break;
+    }
+    const bool fits = atom.hasSize() && atom.isPrintable() && atom.size <= fileSize;
+    return fits ? MetaDataParser::QuickTime : MetaDataParser::Unknown;
 }
 
 } // namespace
@@ -36,9 +141,10 @@ bool beginsLikeAtom(std::string_view bytes) {
 MetaDataParser::StreamType streamTypeOfContents(std::string_view firstBytes) {
     if (beginsLikeStream(firstBytes))
         return MetaDataParser::RawStream;
-    if (firstBytes.starts_with(s_riffSignature) && firstBytes.size() >= detail::s_chunkHeaderSize)
+    if (beginsLikeRIFF(firstBytes))
         return MetaDataParser::Riff;
-    return beginsLikeAtom(firstBytes) ? MetaDataParser::QuickTime : MetaDataParser::Unknown;
+    const FirstAtom atom(firstBytes);
+    return atom.hasSize() && atom.isPrintable() ? MetaDataParser::QuickTime : MetaDataParser::Unknown;
 }
 
 std::string_view extensionFor(MetaDataParser::StreamType type) {
@@ -48,6 +154,35 @@ std::string_view extensionFor(MetaDataParser::StreamType type) {
     case MetaDataParser::RawStream: return ".dat";
     default: return "";
     }
+}
+
+std::string RecognizedContainer::refusal() const {
+    if (!foreignName.empty())
+        return "is " + std::string(foreignName) +
+               "; recording metadata is in movies (MP4, QuickTime), RIFF files (AVI, WAV) and stream files alone";
+    std::string text = "begins neither like a movie, nor a RIFF file, nor a stream";
+    return contradictsName ? text += ", although its name says so" : text;
+}
+
+RecognizedContainer recognizeContainer(std::string_view firstBytes, std::uint64_t fileSize, const std::string& name) {
+    const MetaDataParser::StreamType named = MetaDataParser::streamTypeOf(name);
+    RecognizedContainer recognized;
+    recognized.type = unmistakableType(firstBytes);
+    if (recognized.type == MetaDataParser::Unknown)
+        recognized.foreignName = foreignNameOf(firstBytes);
+    if (recognized.type == MetaDataParser::Unknown && recognized.foreignName.empty())
+        recognized.type = typeByName(firstBytes, fileSize, named);
+    recognized.contradictsName = named != MetaDataParser::Unknown && named != recognized.type;
+    return recognized;
+}
+
+RecognizedContainer recognizeContainer(std::istream& file, const std::string& name) {
+    const std::uint64_t size = sizeOfInput(file);
+    std::array<char, s_recognitionBytes> first;
+    const std::size_t count = readingFrom(file)(0, first);
+    file.clear();
+    file.seekg(0);
+    return recognizeContainer({first.data(), count}, size, name);
 }
 
 } // namespace ZULMetaData

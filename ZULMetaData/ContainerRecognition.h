@@ -1,20 +1,60 @@
 #pragma once
 
-// Tells containers apart by their first bytes, for input that has no file name.
+// Tells what a file is by its first bytes, and by its name only if those say nothing.
+//
+//     std::ifstream file("Recording.m4v", std::ios::binary);
+//     const RecognizedContainer recognized = recognizeContainer(file, "Recording.m4v");
+//     if (recognized.type == MetaDataParser::Unknown)
+//         std::cerr << "Recording.m4v: " << recognized.refusal() << '\n';
 
 #include "../SharedDependencies/Export.h"
 #include "ZULMMetaDataParser.h"
 
+#include <cstddef>
+#include <cstdint>
+#include <istream>
+#include <memory>
+#include <string>
 #include <string_view>
 
 namespace ZULMetaData {
 
-/// What begins like this; 24 bytes are enough to tell. `RawStream` for an identifier of the registry's family, known or
-/// not, `Riff` for its signature, `QuickTime` for an atom whose size covers its header and whose type is printable.
+/// So many bytes from the beginning of a file are enough to tell what it is.
+inline constexpr std::size_t s_recognitionBytes = 512;
+
+/// The container that begins like this; 24 bytes are enough to tell. `RawStream` for an identifier of the registry's
+/// family, known or not, `Riff` for the signatures `RIFF`, `RF64` and `BW64`, `QuickTime` for an atom whose size covers
+/// its header and whose type is printable.
 ZULMETADATA_API MetaDataParser::StreamType streamTypeOfContents(std::string_view firstBytes);
 
 /// The extension, with its dot, under which `MetaDataParser::create` takes a file for a container of this type; empty
 /// for `Unknown`.
 ZULMETADATA_API std::string_view extensionFor(MetaDataParser::StreamType type);
+
+/// What a file is.
+struct ZULMETADATA_API RecognizedContainer {
+    MetaDataParser::StreamType type = MetaDataParser::Unknown; ///< `Unknown` for a file that can hold no metadata
+    std::string_view foreignName; ///< what a file of unknown type is instead, such as "a Matroska file"; may be empty
+    bool contradictsName = false; ///< whether the extension tells another container, or one for a file that is none
+
+    /// Why a file of unknown type is refused, as a clause about the file.
+    std::string refusal() const;
+};
+
+/// The contents win. The name counts for bytes that say nothing: a file that ends before its first atom or chunk, and
+/// a stream file of a kind that is not of the registry's family.
+ZULMETADATA_API RecognizedContainer recognizeContainer(std::string_view firstBytes, std::uint64_t fileSize,
+                                                       const std::string& name);
+
+/// Clears the state of `file` and leaves it at its start. Throws `std::system_error` if reading fails.
+ZULMETADATA_API RecognizedContainer recognizeContainer(std::istream& file, const std::string& name);
+
+/// Opens a file as `MetaDataParser::create` does, but takes it for what `recognizeContainer` says, and finds the
+/// streams after a RIFF chunk of 64-bit or unknown size as well. Throws `std::system_error` if the file cannot be
+/// opened or read, and `std::runtime_error` with the refusal if it can hold no metadata.
+ZULMETADATA_API std::unique_ptr<MetaDataParser> openContainer(const std::string& path);
+
+/// The same for a stream of the caller, which must outlive the parser. Throws `std::system_error` if reading fails.
+ZULMETADATA_API std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, MetaDataParser::StreamType type);
 
 } // namespace ZULMetaData

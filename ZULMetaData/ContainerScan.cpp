@@ -84,8 +84,9 @@ void scanAtoms(std::istream& stream, std::uint64_t total, StreamCache& found) {
     });
 }
 
-void scanChunks(std::istream& stream, std::uint64_t total, StreamCache& found) {
+void scanChunks(std::istream& stream, std::uint64_t total, StreamCache& found, std::uint64_t begin) {
     PositionedInput input(stream, 0, total);
+    input.moveTo(begin);
     const auto visitStreamChunk = [&](std::uint32_t type, std::uint32_t size, std::uint64_t dataStart) {
         if (type != chunkType(s_streamAtom))
             std::cerr << "Found a non DATA chunk mixed in the ZUL meta data\n";

@@ -3,6 +3,7 @@
 #include "ZULMetaData/AtomFormat.h"
 #include "ZULMetaData/PositionedInput.h"
 #include "ZULMetaData/StreamExtent.h"
+#include "ZULMetaData/ZULMMetaDataUUIDs.h"
 
 #include <algorithm>
 #include <optional>
@@ -36,11 +37,26 @@ struct Atom {
     std::uint64_t sizeField() const { return start + detail::s_extendedSizeOffset; }
 };
 
-std::string typeText(std::uint32_t type) {
+/// Whether this library appends atoms like this one.
+bool isOwn(const Atom& atom) {
+    return atom.isExtended() && (atom.type == detail::s_metaDataAtom || atom.type == detail::s_recordingInfoAtom);
+}
+
+/// Whether a movie that lacks a part of the atom may not play.
+bool isMedia(const Atom& atom) {
+    return atom.type == detail::fourCC("moov") || atom.type == detail::fourCC("mdat") ||
+           atom.type == detail::fourCC("moof");
+}
+
+bool isReadable(std::uint32_t type) {
     const auto characters = detail::bigEndianBytes(type);
-    const auto isPlain = [](char c) { return c >= ' ' && c <= '~'; };
-    if (!std::all_of(characters.begin(), characters.end(), isPlain))
+    return std::all_of(characters.begin(), characters.end(), [](char c) { return c >= ' ' && c <= '~'; });
+}
+
+std::string typeText(std::uint32_t type) {
+    if (!isReadable(type))
         return "without a readable type";
+    const auto characters = detail::bigEndianBytes(type);
     std::string text(1, '\'');
     text.append(characters.data(), characters.size());
     return text += '\'';
@@ -95,12 +111,16 @@ private:
     void endInsideHeader(std::uint64_t position);
     bool beginsAppend(std::uint64_t position);
 
-    void closeOpenEnd(const Atom& last, const Atom& previous);
+    bool mendTail(const Atom& last);
+    void closeCutTail(const Atom& last);
+    void setStrayBytesAside(std::uint64_t begin);
+
+    void closeOpenEnd(const Atom& last);
     void closeInterruptedAppend(const Atom& last);
-    void closeInterruptedMetaData(const Atom& metaData);
+    void closeMetaData(const Atom& metaData);
     std::uint64_t endOfWholeStreams(const Atom& metaData);
     std::uint64_t endOfTornStream(const Atom& stream);
-    void setAside(std::uint64_t begin);
+    void setAside(std::uint64_t begin, const std::string& what);
 
     bool isLeftShort(const Atom& atom);
     bool isAppended(std::uint64_t position);
@@ -114,9 +134,11 @@ private:
     void change(std::uint64_t offset, std::string after, std::string reason);
     void find(const Atom& atom, const std::string& what);
     void giveUp(const Atom& atom, const std::string& what);
+    void lose(const std::string& what);
 
     detail::PositionedInput input_;
     std::uint64_t total_;
+    Atom previous_; ///< the atom before the one that is looked at; of size 0 at the beginning
     RepairPlan plan_;
 };
 
@@ -173,41 +195,89 @@ void Planner::giveUp(const Atom& atom, const std::string& what) {
     plan_.state = RepairPlan::Unrepairable;
 }
 
+void Planner::lose(const std::string& what) {
+    plan_.hasLoss = true;
+    plan_.loss += (plan_.loss.empty() ? "" : "; ") + what;
+}
+
 void Planner::walk() {
-    Atom previous;
     for (std::uint64_t position = 0; position < total_ && plan_.state == RepairPlan::Whole;) {
         const auto atom = atomAt(position);
         if (!atom)
             return endInsideHeader(position);
         if (atom->hasOpenEnd())
-            return closeOpenEnd(*atom, previous);
+            return closeOpenEnd(*atom);
         if (atom->isExtended() && atom->size == 0)
             return closeInterruptedAppend(*atom);
         walkOver(*atom, position);
-        previous = *atom;
+        previous_ = *atom;
     }
 }
 
 void Planner::endInsideHeader(std::uint64_t position) {
     const bool isAppend = beginsAppend(position);
+    if (!isAppend && isOwn(previous_))
+        return setStrayBytesAside(position);
     plan_.offset = position;
     plan_.finding = "the last " + bytesText(total_ - position) + ", from offset " + std::to_string(position) + " on, " +
                     (isAppend ? "begin an atom that was never appended" : "do not hold an atom's header");
-    if (isAppend)
-        change(position, {}, "The beginning of an atom that was never appended is cut off.");
-    else
+    if (!isAppend) {
         plan_.state = RepairPlan::Unrepairable;
+        return;
+    }
+    const std::string size = bytesAt(std::min(position + detail::s_extendedSizeOffset, total_),
+                                     total_ - std::min(position + detail::s_extendedSizeOffset, total_));
+    if (size.find_first_not_of('\0') != std::string::npos)
+        lose("all of the atom but the beginning of its header is missing");
+    change(position, {}, "The beginning of an atom that was never appended is cut off.");
 }
 
-/// Whether the file ends inside the header that this library was writing behind the movie.
+/// Whether the file ends inside the header of an atom of this library.
 bool Planner::beginsAppend(std::uint64_t position) {
-    const std::string rest = bytesAt(position, std::min(total_ - position, detail::s_extendedAtomHeaderSize));
+    const std::string rest = bytesAt(position, std::min(total_ - position, detail::s_extendedSizeOffset));
     return position > 0 && !rest.empty() &&
            (text(detail::extendedAtomHeader(detail::s_metaDataAtom, 0)).starts_with(rest) ||
             text(detail::extendedAtomHeader(detail::s_recordingInfoAtom, 0)).starts_with(rest));
 }
 
+/// Mends a last atom that does not fit into the file, if the atom or the one before it belongs to this library: a movie
+/// plays whatever stands there. Returns false for any other atom.
+bool Planner::mendTail(const Atom& last) {
+    const bool isCutShort = last.size >= last.headerSize();
+    if (isOwn(last) && isCutShort && last.start > 0)
+        closeCutTail(last);
+    else if (isOwn(previous_) && !isMedia(last))
+        setStrayBytesAside(last.start);
+    else
+        return false;
+    return true;
+}
+
+void Planner::closeCutTail(const Atom& last) {
+    find(last, "declares " + bytesText(last.size) + ", but the file ends after " + std::to_string(total_ - last.start));
+    if (last.type == detail::s_metaDataAtom) {
+        closeMetaData(last);
+        if (!plan_.hasLoss)
+            lose("the streams that followed its last one are missing");
+        return;
+    }
+    lose("the name and the versions in it are incomplete and are dropped");
+    setAside(last.start, "an atom that was cut short");
+}
+
+void Planner::setStrayBytesAside(std::uint64_t begin) {
+    plan_.offset = begin;
+    plan_.finding =
+        "the last " + bytesText(total_ - begin) + ", from offset " + std::to_string(begin) + " on, belong to no atom";
+    setAside(begin, "no atom");
+}
+
 void Planner::walkOver(const Atom& atom, std::uint64_t& position) {
+    const bool fits = atom.size >= atom.headerSize() && atom.size <= total_ - atom.start;
+    if (!fits && mendTail(atom)) {
+        position = total_;
+        return;
+    }
     if (atom.size < atom.headerSize())
         return giveUp(atom, "declares " + bytesText(atom.size) + ", which its own header does not fit in");
     if (atom.size > total_ - atom.start)
@@ -243,18 +313,22 @@ bool Planner::isAppended(std::uint64_t position) {
     return atom->size == 0 || (atom->size >= atom->headerSize() && atom->size <= total_ - position);
 }
 
-void Planner::closeOpenEnd(const Atom& last, const Atom& previous) {
+void Planner::closeOpenEnd(const Atom& last) {
     const std::uint64_t length = total_ - last.start;
+    if (!isReadable(last.type) && last.start > 0)
+        return setStrayBytesAside(last.start);
+    if (!isReadable(last.type))
+        return giveUp(last, "has an open end: the file does not begin like a movie");
     if (length <= s_largestShortSize) {
         find(last, "has an open end");
         return change(last.start, text(detail::bigEndianBytes(static_cast<std::uint32_t>(length))),
                       "The atom " + typeText(last.type) + " ends where the file does.");
     }
-    if (previous.type != detail::s_spareAtom || previous.size != detail::s_atomHeaderSize)
+    if (previous_.type != detail::s_spareAtom || previous_.size != detail::s_atomHeaderSize)
         return giveUp(last, "has an open end, and its " + bytesText(length) +
                                 " do not fit in a 32-bit size; no spare 'wide' atom stands in front of it");
     find(last, "has an open end");
-    change(previous.start, text(detail::extendedAtomHeader(last.type, length + previous.size)),
+    change(previous_.start, text(detail::extendedAtomHeader(last.type, length + previous_.size)),
            "The atom " + typeText(last.type) +
                " takes in the spare 'wide' atom for a 64-bit size, and ends where the file does.");
 }
@@ -262,15 +336,15 @@ void Planner::closeOpenEnd(const Atom& last, const Atom& previous) {
 void Planner::closeInterruptedAppend(const Atom& last) {
     find(last, "was appended, but never given its size");
     if (last.type == detail::s_metaDataAtom)
-        return closeInterruptedMetaData(last);
+        return closeMetaData(last);
     change(last.sizeField(), text(detail::bigEndianBytes(total_ - last.start)),
            "The atom " + typeText(last.type) + " ends where the file does.");
 }
 
-void Planner::closeInterruptedMetaData(const Atom& metaData) {
+void Planner::closeMetaData(const Atom& metaData) {
     const std::uint64_t end = endOfWholeStreams(metaData);
     if (end < total_)
-        setAside(end);
+        setAside(end, "an entry that was cut short");
     change(metaData.sizeField(), text(detail::bigEndianBytes(end - metaData.start)),
            end < total_ ? "The atom 'ZULM' ends behind its last whole entry."
                         : "The atom 'ZULM' ends where the file does.");
@@ -282,7 +356,8 @@ std::uint64_t Planner::endOfWholeStreams(const Atom& metaData) {
     while (position < total_) {
         const auto stream = streamAtomAt(position);
         if (!stream) {
-            plan_.hasLoss = true;
+            lose("the " + bytesText(total_ - position) + " from offset " + std::to_string(position) +
+                 " on do not hold a whole stream");
             return beginsStreamAtom(position) ? position : total_;
         }
         if (stream->size > total_ - position)
@@ -301,14 +376,18 @@ bool Planner::beginsStreamAtom(std::uint64_t position) {
 }
 
 std::uint64_t Planner::endOfTornStream(const Atom& stream) {
-    plan_.hasLoss = true;
     const std::uint64_t payload = stream.start + stream.headerSize();
     const auto readPayload = [&](std::uint64_t position, std::span<char> bytes) {
         return read(payload + position, bytes);
     };
     const auto extent = measureStream(readPayload, total_ - payload);
     const std::uint64_t end = payload + (extent ? extent->wholeBytes : 0);
-    if (!extent || streamAtomAt(end))
+    const bool isFollowed = !extent || streamAtomAt(end);
+    lose(!extent      ? "the last stream has no whole header"
+         : isFollowed ? "a stream at offset " + std::to_string(payload) + " counts bytes that are not there"
+                      : "the stream of the kind " + metaDataKindName(extent->header.uuid) + " ends after " +
+                            std::to_string(extent->entries) + (extent->entries == 1 ? " entry" : " entries"));
+    if (isFollowed)
         return total_; // its length counts a torn tail that is not there, and more streams follow
     change(stream.sizeField(), text(detail::bigEndianBytes(end - stream.start)),
            "The last stream ends behind its last whole entry.");
@@ -317,15 +396,16 @@ std::uint64_t Planner::endOfTornStream(const Atom& stream) {
 
 /// A reader takes the bytes of an entry that was cut short from whatever follows it: nothing of it may stay behind
 /// the last whole one.
-void Planner::setAside(std::uint64_t begin) {
+void Planner::setAside(std::uint64_t begin, const std::string& what) {
     const std::uint64_t count = total_ - begin;
+    const std::string subject = "The bytes of " + what;
     if (count < detail::s_atomHeaderSize)
-        return change(begin, {}, "The bytes of an entry that was cut short are cut off.");
+        return change(begin, {}, subject + " are cut off.");
     std::string header = text(detail::extendedAtomHeader(detail::s_freeAtom, count));
     if (count <= s_largestShortSize)
         header = text(detail::bigEndianBytes(static_cast<std::uint32_t>(count))) +
                  text(detail::bigEndianBytes(detail::s_freeAtom));
-    change(begin, std::move(header), "The bytes of an entry that was cut short become a 'free' atom.");
+    change(begin, std::move(header), subject + " become a 'free' atom.");
 }
 
 } // namespace

@@ -3,8 +3,9 @@
 // What must change in a movie so that its atoms fill the file, and what is appended to it can be found. Nothing is
 // written here; `SafeMovieSave` carries a plan out.
 //
-// Mended are a last atom with an open end, an append that was interrupted, and a movie that
-// `Util::finalizeAtomsInFile` left 8 bytes short. Nothing is changed where two readings are possible.
+// A plan mends a last atom with an open end, an append that was interrupted, metadata at the end of the movie that was
+// cut short or has stray bytes after it, and a movie that `Util::finalizeAtomsInFile` left 8 bytes short. It changes
+// nothing if two readings are possible.
 
 #include "../SharedDependencies/Export.h"
 
@@ -32,7 +33,8 @@ struct RepairPlan {
     std::vector<RepairChange> changes; ///< each must be on the disk before the next is made
     std::string finding;               ///< what is wrong, in one sentence; empty where nothing is
     std::uint64_t offset = 0;          ///< of the atom that is wrong
-    bool hasLoss = false;              ///< part of an interrupted append never got into the movie
+    bool hasLoss = false;              ///< part of the metadata at the end of the movie is missing
+    std::string loss;                  ///< what is missing, as a clause about the atom of the finding; else empty
 };
 
 /// Reads the headers of the movie's atoms, and the entries of a stream whose append was interrupted. Clears the

@@ -1,11 +1,10 @@
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include "ZULMetaData/ContainerScan.h"
-#include "ZULMetaData/FileInputBuffer.h"
+#include "ZULMetaData/FileParser.h"
 #include "ZULMetaData/PositionedInput.h"
 
 #include <algorithm>
-#include <fstream>
 #include <iostream>
 #include <utility>
 
@@ -22,44 +21,6 @@ std::string extensionOf(const std::string& path) {
     return extension;
 }
 
-class MetaDataFileParser final : public MetaDataParser {
-public:
-    explicit MetaDataFileParser(const std::string& path) : type_(streamTypeOf(path)), buffer_(*file_.rdbuf()) {
-        stream().rdbuf(&buffer_);
-        fileOpen(file_, path.c_str(), std::ios_base::in | std::ios_base::binary);
-    }
-
-    bool isOpen() const { return file_.is_open(); }
-
-    StreamType getStreamType() const override { return type_; }
-    std::istream& getStream() override { return file_; }
-    void close() override {
-        file_.close();
-        buffer_.forget();
-    }
-
-private:
-    /// Only as such can it be given another buffer.
-    std::istream& stream() { return file_; }
-
-    StreamType type_;
-    std::ifstream file_;
-    detail::FileInputBuffer buffer_;
-};
-
-class MetaDataStreamParser final : public MetaDataParser {
-public:
-    MetaDataStreamParser(std::istream& stream, StreamType type) : stream_(stream), type_(type) {}
-
-    StreamType getStreamType() const override { return type_; }
-    std::istream& getStream() override { return stream_; }
-    void close() override {}
-
-private:
-    std::istream& stream_;
-    StreamType type_;
-};
-
 } // namespace
 
 MetaDataParser::StreamType MetaDataParser::streamTypeOf(const std::string& path) {
@@ -72,7 +33,7 @@ MetaDataParser::StreamType MetaDataParser::streamTypeOf(const std::string& path)
 }
 
 std::unique_ptr<MetaDataParser> MetaDataParser::create(const std::string& path) {
-    auto parser = std::make_unique<MetaDataFileParser>(path);
+    auto parser = std::make_unique<detail::FileParser>(path, streamTypeOf(path));
     if (!parser->isOpen()) {
         std::cerr << "Can't parse metadata. Unable to open file: " << path << std::endl;
         return nullptr;
@@ -85,7 +46,7 @@ std::unique_ptr<MetaDataParser> MetaDataParser::create(std::istream& stream, Str
         std::cerr << "Can't parse metadata. Stream is not good." << std::endl;
         return nullptr;
     }
-    auto parser = std::make_unique<MetaDataStreamParser>(stream, type);
+    auto parser = std::make_unique<detail::StreamParser>(stream, type);
     return parser->cacheFileStreamInfo() ? std::move(parser) : nullptr;
 }
 
@@ -120,6 +81,10 @@ void MetaDataParser::loadAllData(std::map<uuid, std::string>& out) {
         stream.read(bytes.data(), static_cast<std::streamsize>(bytes.size()));
         bytes.resize(static_cast<std::size_t>(stream.gcount()));
     }
+}
+
+void MetaDataParser::cacheStream(const uuid& type, CachedFileData place) {
+    cache_[type] = place;
 }
 
 bool MetaDataParser::cacheFileStreamInfo() {

@@ -71,6 +71,9 @@ public:
 protected:
     MetaDataParser() = default;
 
+    /// Makes a stream known that the scan does not find. The next scan forgets it.
+    void cacheStream(const uuid& type, CachedFileData place);
+
 private:
     std::map<uuid, CachedFileData> cache_;
 };

@@ -58,6 +58,7 @@
 #include "Source/MetaDataWriters/TopmostWindowTitleMetaDataWriter.h"
 #include "Source/SafeMovieSave.h"
 #include "Source/StreamRedaction.h"
+#include "Source/StreamRetiming.h"
 #include "Source/StreamSalvage.h"
 #include "Source/StreamSource.h"
 #include "Source/ZULMAtomRepair.h"

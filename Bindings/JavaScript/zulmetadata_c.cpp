@@ -105,16 +105,13 @@ ReadSlice readingWith(ZulmReadAt readAt, void* context) {
     };
 }
 
-MetaDataParser::StreamType typeOf(const ReadSlice& read, const std::string& name) {
-    const MetaDataParser::StreamType named = MetaDataParser::streamTypeOf(name);
-    if (named != MetaDataParser::Unknown)
-        return named;
-    std::array<char, 64> first;
+MetaDataParser::StreamType typeOf(const ReadSlice& read, std::uint64_t fileSize, const std::string& name) {
+    std::array<char, s_recognitionBytes> first;
     const std::size_t size = read(0, first.data(), first.size());
-    const auto type = streamTypeOfContents({first.data(), size});
-    if (type == MetaDataParser::Unknown)
-        throw Zulm::Failure(fmt::format("{}: begins neither like a movie, nor a RIFF file, nor a stream", name));
-    return type;
+    const RecognizedContainer recognized = recognizeContainer({first.data(), size}, fileSize, name);
+    if (recognized.type == MetaDataParser::Unknown)
+        throw Zulm::Failure(fmt::format("{}: {}", name, recognized.refusal()));
+    return recognized.type;
 }
 
 constexpr double s_nothing = std::numeric_limits<double>::quiet_NaN();
@@ -225,7 +222,7 @@ const char* zulm_last_error(void) {
 ZulmRecording* zulm_open(ZulmReadAt readAt, void* context, uint64_t size, const char* name) {
     return orNull([&] {
         const ReadSlice read = readingWith(readAt, context);
-        auto opened = std::make_unique<ZulmRecording>(read, size, typeOf(read, name), name);
+        auto opened = std::make_unique<ZulmRecording>(read, size, typeOf(read, size, name), name);
         fillIn(*opened);
         return opened.release();
     });

@@ -25,21 +25,15 @@ namespace ZULMetaData::Python {
 
 namespace {
 
-/// Throws `OSError` for a file that cannot be opened, `ValueError` where its name tells no container.
+/// Throws `OSError` for a file that cannot be opened or read, `ValueError` for one that can hold no metadata.
 std::unique_ptr<MetaDataParser> openRecording(const FileLocation& file) {
-    const std::string path = utf8Path(file);
-    errno = 0;
-    std::ifstream stream;
-    fileOpen(stream, path.c_str(), std::ios_base::binary);
-    if (!stream.is_open())
-        throw FileError::ofErrno(file);
-    if (MetaDataParser::streamTypeOf(path) == MetaDataParser::Unknown)
-        throwValueError(path + ": neither a movie nor a RIFF file nor a stream file, by its name");
-    auto parser = MetaDataParser::create(path);
-    if (!parser)
-        throw FileError::ofErrno(file);
-    requireReadable(parser->getStream());
-    return parser;
+    try {
+        return naming(file, [&] { return openContainer(utf8Path(file)); });
+    } catch (const FileError&) {
+        throw;
+    } catch (const std::runtime_error& refusal) {
+        throwValueError(utf8Path(file) + ": " + refusal.what());
+    }
 }
 
 /// A stream of a recording, found when the recording was opened.
@@ -303,7 +297,8 @@ void addRepairing(py::module_& module) {
                       "The changes, in the order in which they are made; empty if there is no repair.")
         .def_readonly("finding", &RepairPlan::finding, "What is wrong, in one sentence; empty if nothing is.")
         .def_readonly("offset", &RepairPlan::offset, "The position of the atom that is wrong.")
-        .def_readonly("has_loss", &RepairPlan::hasLoss, "Part of an interrupted append never got into the movie.")
+        .def_readonly("has_loss", &RepairPlan::hasLoss, "Part of the metadata at the end of the movie is missing.")
+        .def_readonly("loss", &RepairPlan::loss, "What is missing, in words; empty if nothing is.")
         .def("__repr__", [](const RepairPlan& plan) {
             return py::str("<Repair {} changes={}>").format(stateOf(plan), plan.changes.size());
         });

@@ -272,6 +272,116 @@ TEST_F(AttachCommand, SurvivesOldMoviesWithHostileSizes) {
     }
 }
 
+// Movies by their contents -----------------------------------------------------------------------------------------
+
+TEST_F(AttachCommand, TakesMoviesWhateverTheirNames) {
+    for (const char* name : {"Movie.m4v", "Movie.ismv", "Movie", "Movie.3gp"}) {
+        const std::string movie = stream(name, tinyMovie());
+        const ToolResult result = runTool({"attach", movie, streamFile("cpuUsage"), "--in-place"});
+        EXPECT_EQ(result.exitCode, 0) << result.errors;
+        EXPECT_EQ(result.errors, "");
+        EXPECT_EQ(contentsOf(movie), tinyMovie() + zulmAtom({contentsOf(streamFile("cpuUsage"))}));
+    }
+    const ToolResult named = runTool({"attach", plain, streamFile("cpuUsage"), "-o", folder / "Out.m4v"});
+    EXPECT_EQ(named.exitCode, 0);
+    EXPECT_THAT(named.errors, HasSubstr("programs that go by the name do not take it for a movie"));
+}
+
+TEST_F(AttachCommand, TellsStreamFilesByTheirContents) {
+    const std::string old = stream("Old.dat", media() + zulmAtom({locationStream()}));
+    const ToolResult result = runTool({"attach", plain, old, "-o", out});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("not a stream file (.dat) but a movie; '--from " + old));
+    EXPECT_EQ(runTool({"attach", plain, stream("locations", locationStream()), "-o", out}).exitCode, 0);
+}
+
+// Metadata that is torn at the end ---------------------------------------------------------------------------------
+
+TEST_F(AttachCommand, MendsMetadataThatIsTornAtTheEnd) {
+    const std::string whole = tinyMovie() + zulmAtom({locationStream()}) + extendedAtom("ZULR", std::string(64, 's'));
+    const std::string cpu = streamFile("cpuUsage");
+    const std::string torn = stream("Torn.mp4", whole.substr(0, whole.size() - 1));
+    const ToolResult result = runTool({"attach", torn, cpu, "--in-place"});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.errors, HasSubstr("the name and the versions in it are incomplete and are dropped"));
+    EXPECT_EQ(streamsIn(torn).size(), 2U);
+    const std::string stray = stream("Stray.mp4", whole + "\n");
+    EXPECT_EQ(runTool({"attach", stray, cpu, "--in-place"}).exitCode, 0);
+    EXPECT_EQ(contentsOf(stray), whole + zulmAtom({contentsOf(cpu)}));
+}
+
+// Times -------------------------------------------------------------------------------------------------------------
+
+TEST_F(AttachCommand, WarnsOfEntriesBehindTheEndOfTheMovie) {
+    writeFile(plain, tinyMovie(420, 600)); // 0.7 seconds
+    const ToolResult result = runTool({"attach", plain, stream("a.dat", locationStream()), "-o", out, "--json"});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_THAT(result.errors, HasSubstr("1 entry of 1 stream lies after the end of the movie at 0.700 s, the last at "
+                                         "1.000 s; --shift moves the times, and --trim leaves such entries out"));
+    EXPECT_EQ(nlohmann::json::parse(result.output).at("files").at(0).at("entries_after_end"), 1);
+    EXPECT_EQ(runTool({"attach", plain, stream("a.dat", locationStream()), "-o", out, "--force", "--quiet"}).errors,
+              "");
+}
+
+TEST_F(AttachCommand, ShiftsTimes) {
+    const std::string old = stream("Old.mp4", media() + zulmAtom({locationStream()}));
+    const ToolResult result = runTool({"attach", plain, "--from", old, "--shift", "-0.25", "-o", out});
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_EQ(contentsOf(out), tinyMovie() + zulmAtom({streamHeader(s_cursorLocations, 1, 16) +
+                                                       pointEntry(0.25, 10, 20) + pointEntry(0.75, -3, 7)}));
+    const ToolResult before = runTool({"attach", plain, "--from", old, "--shift", "-0:00:05", "-o", out, "--force"});
+    EXPECT_THAT(before.errors, HasSubstr("entries lie before the beginning of the movie, the first at -4.500 s"));
+    for (const std::string word : {"nan", "x", ""})
+        EXPECT_EQ(runTool({"attach", plain, "--from", old, "--shift", word, "-o", out, "--force"}).exitCode, 2) << word;
+}
+
+TEST_F(AttachCommand, TrimsWhatLiesOutsideOfTheMovie) {
+    writeFile(plain, tinyMovie(420, 600));
+    const std::string old = stream("Old.mp4", media() + zulmAtom({locationStream(), appNameStream()}));
+    const ToolResult result = runTool({"attach", plain, "--from", old, "--trim", "-o", out, "--json"});
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_EQ(result.errors, "");
+    const auto file = nlohmann::json::parse(result.output).at("files").at(0);
+    EXPECT_EQ(file.at("entries_trimmed"), 2);
+    EXPECT_EQ(file.at("entries_after_end"), 0);
+    EXPECT_EQ(file.at("streams").at(0).at("source"), old);
+    EXPECT_EQ(contentsOf(out),
+              tinyMovie(420, 600) + zulmAtom({locationStream().substr(0, 40), appNameStream().substr(0, 24 + 15)}));
+    EXPECT_EQ(namesInFolder(), (std::vector<std::string>{"Old.mp4", "Out.mp4", "Plain.mp4"}));
+}
+
+TEST_F(AttachCommand, LeavesOutStreamsOfWhichNothingIsInTheMovie) {
+    writeFile(plain, tinyMovie(420, 600));
+    const std::string late = stream("late.dat", streamHeader(s_cursorLocations, 1, 16) + pointEntry(9, 1, 2));
+    const ToolResult none = runTool({"attach", plain, late, "--trim", "-o", out});
+    EXPECT_EQ(none.exitCode, 3);
+    EXPECT_THAT(none.errors, HasSubstr("no entry of cursorLocation lies in the movie; the stream is left out"));
+    EXPECT_FALSE(std::filesystem::exists(out));
+}
+
+TEST_F(AttachCommand, CannotTrimToAnEndThatNobodyTells) {
+    writeFile(plain, media());
+    const ToolResult result = runTool({"attach", plain, stream("a.dat", locationStream()), "--trim", "-o", out});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("--trim: the movie does not tell how long it lasts"));
+}
+
+// The index of fragments ---------------------------------------------------------------------------------------------
+
+TEST_F(AttachCommand, SaysThatTheIndexOfFragmentsIsNoLongerAtTheEnd) {
+    const std::string index = atom("mfra", "index of fragments");
+    const std::string movie = stream("Fragments.ismv", tinyMovie() + index);
+    const ToolResult left = runTool({"attach", movie, streamFile("cpuUsage"), "-o", out, "--json"});
+    EXPECT_EQ(left.exitCode, 0);
+    EXPECT_THAT(left.errors, HasSubstr("the index of its fragments (mfra) is no longer at the end of the file"));
+    EXPECT_EQ(nlohmann::json::parse(left.output).at("files").at(0).at("fragment_index"), "not-at-end");
+    const ToolResult moved = runTool({"attach", movie, streamFile("cpuUsage"), "--move-mfra", "-o", out, "--force"});
+    EXPECT_EQ(moved.exitCode, 0);
+    EXPECT_EQ(moved.errors, "");
+    EXPECT_EQ(contentsOf(out), tinyMovie() + atom("free", "index of fragments") +
+                                   zulmAtom({contentsOf(streamFile("cpuUsage"))}) + index);
+}
+
 // Outputs ---------------------------------------------------------------------------------------------------------
 
 TEST_F(AttachCommand, ReplacesAnOutputOnlyByForceAndNeverAnInput) {
@@ -303,7 +413,8 @@ TEST_F(AttachCommand, RefusesMoviesThatAreNone) {
     EXPECT_EQ(runTool({"attach", stream("Empty.mp4", ""), cpu, "--in-place"}).exitCode, 1);
     EXPECT_EQ(runTool({"attach", stream("a.avi", riffMedia()), cpu, "--in-place"}).exitCode, 1);
     EXPECT_EQ(runTool({"attach", folder / "missing.mp4", cpu, "--in-place"}).exitCode, 1);
-    EXPECT_EQ(runTool({"attach", plain, cpu, "-o", folder / "Out.bin"}).exitCode, 1);
+    EXPECT_EQ(runTool({"attach", plain, cpu, "-o", folder / "Out.avi"}).exitCode, 1);
+    EXPECT_EQ(runTool({"attach", stream("Zeros.mp4", std::string(5000, '\0')), cpu, "--in-place"}).exitCode, 1);
     EXPECT_EQ(runTool({"attach", plain, cpu, "-o", folder / "no folder/Out.mp4"}).exitCode, 1);
 }
 

@@ -100,7 +100,7 @@ TEST_F(CommandLine, TakesAFileThatIsNamedLikeACommand) {
     writeFile(folder / "info", "");
     ToolOptions options;
     options.folder = folder.path().string();
-    EXPECT_THAT(runTool({"info", "info"}, options).errors, HasSubstr("info: not a movie"));
+    EXPECT_THAT(runTool({"info", "info"}, options).errors, HasSubstr("info: begins neither like a movie"));
 }
 
 TEST_F(CommandLine, TakesOptionsOfEveryCommandOnEitherSideOfIt) {

@@ -61,6 +61,46 @@ TEST_F(InfoCommand, TellsTheDurationWhereTheMovieDoes) {
     EXPECT_THAT(run({"info", "a.wav"}).output, HasSubstr("a.wav: RIFF, duration not told, 112 bytes, 1 stream\n"));
 }
 
+TEST_F(InfoCommand, TakesARecordingForWhatItsContentsSay) {
+    const std::string movie = movieWith(extendedAtom("DATA", locations()));
+    for (const char* name : {"a.m4v", "a.m4a", "a.3gp", "a.ismv", "a.qt", "movie", "a.dat", "a.wav"})
+        EXPECT_EQ(reportOn(written(name, movie)).at("container"), "movie") << name;
+    EXPECT_EQ(reportOn(written("a.wave", waveWithLocations())).at("container"), "RIFF");
+    EXPECT_EQ(reportOn(written("locations", locations())).at("container"), "stream");
+    EXPECT_THAT(run({"info", "a.dat"}).errors, HasSubstr("a.dat: is a movie by its contents, whatever its name says"));
+    EXPECT_EQ(run({"info", "a.m4v"}).errors, "");
+}
+
+TEST_F(InfoCommand, NamesContainersThatHoldNoMetadata) {
+    const ToolResult result = run({"info", written("a.mkv", hex("1a45dfa3 9f 4286 81 01") + "B\x82\x88matroska")});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("a.mkv: is a Matroska file; recording metadata is in movies"));
+    EXPECT_EQ(run({"info", written("Zeros.mp4", std::string(5000, '\0'))}).exitCode, 1);
+}
+
+TEST_F(InfoCommand, ReadsStandardInputByItsOtherNames) {
+    ToolOptions options;
+    options.input = movieWith(extendedAtom("DATA", locations()));
+    const ToolResult piped = run({"info", "/dev/stdin"}, options);
+    EXPECT_EQ(piped.exitCode, 0) << piped.errors;
+    EXPECT_THAT(piped.output, HasSubstr("/dev/stdin: movie"));
+    written("a.mp4", options.input);
+    options.folder = folder.path().string();
+    EXPECT_EQ(runProgram("sh", {"-c", "exec \"$0\" info /dev/stdin < a.mp4", ZULM_PATH}, options).exitCode, 0);
+}
+
+TEST_F(InfoCommand, FindsMetadataBehindRIFFFilesOf64BitsAndFromPipes) {
+    const std::string streams = chunk("ZULM", chunk("DATA", locations()));
+    const std::string ds64 = chunk("ds64", raw(std::uint64_t{4 + 36}) + std::string(20, '\0'));
+    for (const std::string& media :
+         {"RF64" + le32(0xffffffff) + "WAVE" + ds64, "BW64" + le32(0xffffffff) + "WAVE" + ds64,
+          "RIFF" + le32(0) + "WAVE", "RIFF" + le32(0xffffffff) + "WAVEdata" + le32(0xffffffff)}) {
+        const json report = reportOn(written("a.wav", media + streams));
+        EXPECT_EQ(report.at("streams").at(0).at("kind"), "cursorLocation");
+        EXPECT_EQ(report.at("streams").at(0).at("entries"), 3);
+    }
+}
+
 TEST_F(InfoCommand, CountsEntriesPerSecondBetweenTheFirstAndTheLast) {
     std::string stream = streamHeader("2b7b6af2", 1, 16);
     for (int i = 0; i <= 10; ++i)
@@ -108,7 +148,7 @@ TEST_F(InfoCommand, GoesOnBehindAFileThatCannotBeRead) {
 TEST_F(InfoCommand, RefusesWhatIsNoRecordingByItsName) {
     const ToolResult result = run({"info", written("notes.txt", "text")});
     EXPECT_EQ(result.exitCode, 1);
-    EXPECT_THAT(result.errors, HasSubstr("notes.txt: not a movie (.mp4, .mov, .zcap)"));
+    EXPECT_THAT(result.errors, HasSubstr("notes.txt: begins neither like a movie, nor a RIFF file, nor a stream"));
 }
 
 TEST_F(InfoCommand, DoesNotWaitForAPipe) {

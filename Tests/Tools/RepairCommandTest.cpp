@@ -99,8 +99,29 @@ TEST_F(RepairCommand, MendsAnAppendThatWasInterrupted) {
     EXPECT_EQ(result.exitCode, 3) << "part of a stream never got into the movie";
     EXPECT_THAT(result.output, HasSubstr("the atom 'ZULM' at offset 30 was appended, but never given its size"));
     EXPECT_THAT(result.output, HasSubstr("-> (cut off)"));
-    EXPECT_THAT(result.errors, HasSubstr("part of it never got into the movie"));
+    EXPECT_THAT(result.errors,
+                HasSubstr("the stream of the kind cursorLocation ends after 1 entry. Every whole entry is kept"));
     EXPECT_EQ(contentsOf(movie), media() + zulmAtom({appNameStream(), locationStream().substr(0, 40)}));
+}
+
+TEST_F(RepairCommand, MendsMetadataThatLacksItsLastByte) {
+    const std::string whole = media() + zulmAtom({locationStream()}) + extendedAtom("ZULR", std::string(64, 's'));
+    writeFile(movie, whole.substr(0, whole.size() - 1));
+    const ToolResult result = runTool({"repair", movie, "--in-place"});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.errors, HasSubstr("the name and the versions in it are incomplete and are dropped"));
+    EXPECT_EQ(runTool({"repair", movie, "--dry-run"}).exitCode, 0);
+    EXPECT_EQ(runTool({"verify", movie}).exitCode, 0);
+    EXPECT_THAT(contentsOf(movie), testing::StartsWith(media() + zulmAtom({locationStream()})));
+}
+
+TEST_F(RepairCommand, CutsOffStrayBytesBehindMetadata) {
+    const std::string whole = media() + zulmAtom({locationStream()});
+    writeFile(movie, whole + "\n");
+    const ToolResult result = runTool({"repair", movie, "--in-place"});
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_THAT(result.output, HasSubstr("the last 1 byte, from offset 118 on, belong to no atom"));
+    EXPECT_EQ(contentsOf(movie), whole);
 }
 
 TEST_F(RepairCommand, ReportsAsJSON) {

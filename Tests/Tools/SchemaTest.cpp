@@ -56,8 +56,9 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         EXPECT_EQ(file.path().filename(), name + ".schema.json");
         commands.push_back(name.substr(5));
     }
-    EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "diff", "dump", "extract", "grep", "info",
-                                                        "redact", "repair", "salvage", "stamp", "verify", "view"));
+    EXPECT_THAT(commands,
+                testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "extract", "grep",
+                                              "info", "redact", "repair", "salvage", "stamp", "verify", "view"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
@@ -115,6 +116,8 @@ TEST_F(Schema, HoldsForAttachAndStamp) {
     const std::string plain = written("plain.mp4", tinyMovie());
     expectValid({outputOf({"attach", plain, torn(), tornNames, "-o", folder / "attached.mp4"}),
                  outputOf({"attach", interrupted(), "--from", movie(), "-o", folder / "carried.mp4"})});
+    expectValid({outputOf({"compact", movie(), "-o", folder / "compact.mp4"}),
+                 outputOf({"detach", movie(), "-o", folder / "detached.mp4"})});
     expectValid({outputOf({"stamp", plain, "--creator", "a", "--creator-version", "1", "-o", folder / "stamped.mp4"})});
 }
 

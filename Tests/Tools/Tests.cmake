@@ -20,6 +20,7 @@ zulm_add_tests(ToolsTests
   AtomsCommandTest
   AttachCommandTest
   CommandLineTest
+  CompactCommandTest
   ConvertCommandTest
   DemoCommandTest
   DiffCommandTest

@@ -142,6 +142,42 @@ TEST_F(VerifyCommand, PrintsNoticesAndEndsWell) {
                                  file + ": ok (1 stream, 2 entries)\n");
 }
 
+TEST_F(VerifyCommand, TakesNoticesForDamageWhereItIsStrict) {
+    const std::string file = newFile("Locations.dat", locations({2, 1}));
+    const ToolResult result = runTool({"verify", "--strict", file});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_EQ(result.output.find("ok ("), std::string::npos) << result.output;
+    EXPECT_EQ(runTool({"verify", "--strict", movie()}).exitCode, 0);
+}
+
+TEST_F(VerifyCommand, LeavesOutWhatItIsToIgnore) {
+    const std::string file = newFile("Locations.dat", locations({2, 1}) + "torn");
+    const ToolResult result =
+        runTool({"verify", "--strict", "--ignore", "time-backwards", "--ignore", "torn-entry", file});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_EQ(result.output, file + ": ok (1 stream, 2 entries)\n");
+    EXPECT_EQ(runTool({"verify", "--ignore", "time-backwards", file}).exitCode, 3);
+    const ToolResult unknown = runTool({"verify", "--ignore", "torn-entri", file});
+    EXPECT_EQ(unknown.exitCode, 2);
+    EXPECT_NE(unknown.errors.find("did you mean torn-entry?"), std::string::npos) << unknown.errors;
+}
+
+TEST_F(VerifyCommand, ListsItsRules) {
+    const ToolResult result = runTool({"verify", "--rules"});
+    EXPECT_EQ(result.exitCode, 0);
+    for (const FindingRule& rule : s_findingRules)
+        EXPECT_NE(result.output.find(std::string(rule.name) + ' '), std::string::npos) << rule.name;
+    EXPECT_EQ(runTool({"verify"}).exitCode, 2);
+}
+
+TEST_F(VerifyCommand, CallsAStreamThatWasReplacedNoDamage) {
+    const std::string copy = copyOf(movie());
+    ASSERT_EQ(runTool({"attach", copy, streamFile("cpuUsage"), "--replace", "--in-place"}).exitCode, 0);
+    const ToolResult result = runTool({"verify", copy});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_NE(result.output.find("notice: this stream takes the place of an earlier one"), std::string::npos);
+}
+
 TEST_F(VerifyCommand, SaysHowManyFindingsItLeavesOut) {
     const std::vector<double> times(1500, std::numeric_limits<double>::quiet_NaN());
     const std::string file = newFile("Locations.dat", locations(times));

@@ -67,14 +67,20 @@ void expectUnrepairable(const RepairPlan& plan, std::uint64_t offset, const std:
     EXPECT_THAT(plan.finding, HasSubstr(finding));
 }
 
-void expectOneChange(const RepairPlan& plan, std::uint64_t offset, const std::string& before,
-                     const std::string& after) {
+void expectOneChangeWithLoss(const RepairPlan& plan, std::uint64_t offset, const std::string& before,
+                             const std::string& after) {
     EXPECT_EQ(plan.state, RepairPlan::Repairable) << plan.finding;
     ASSERT_EQ(plan.changes.size(), 1U);
     EXPECT_EQ(plan.changes[0].offset, offset);
     EXPECT_EQ(plan.changes[0].before, before);
     EXPECT_EQ(plan.changes[0].after, after);
+}
+
+void expectOneChange(const RepairPlan& plan, std::uint64_t offset, const std::string& before,
+                     const std::string& after) {
+    expectOneChangeWithLoss(plan, offset, before, after);
     EXPECT_FALSE(plan.hasLoss);
+    EXPECT_EQ(plan.loss, "");
 }
 
 std::string interrupted(const std::string& type, const std::string& payload) {
@@ -163,7 +169,7 @@ TEST(RepairPlan, GoesOnToAnInterruptedAppendBehindThem) {
 
 TEST(RepairPlan, CannotMendAMovieWhoseAtomBehindThemReachesBeyondTheEnd) {
     const std::string stamp = extendedAtom("ZULR", std::string(64, '\0'));
-    expectUnrepairable(planForShortMovie(hex("ffffffffffffffff"), stamp + be32(100) + "free"),
+    expectUnrepairable(planForShortMovie(hex("ffffffffffffffff"), stamp + be32(100) + "moov"),
                        12 + s_4GiB + 8 + stamp.size(), "but the file ends after 8");
 }
 
@@ -309,9 +315,78 @@ TEST(RepairPlan, CannotMendAnotherHeaderThatIsCutShort) {
     const std::string movie = media() + interrupted("ZULX", "");
     for (std::size_t length = 38; length < 46; ++length)
         expectUnrepairable(planFor(movie.substr(0, length)), 30, "do not hold an atom's header");
-    expectUnrepairable(planFor(media() + be32(1) + "ZULM" + be32(7)), 30,
-                       "the last 12 bytes, from offset 30 on, do not hold an atom's header");
     expectUnrepairable(planFor(media() + "x"), 30, "the last 1 byte, from offset 30 on, do not hold an atom's header");
+}
+
+// Metadata at the end that is torn --------------------------------------------------------------------------------
+
+TEST(RepairPlan, ClosesMetadataThatIsCutShortAtAnyByte) {
+    const std::string stamp = extendedAtom("ZULR", std::string(64, 's'));
+    const std::string metadata = zulmAtom({locationStream(), appNameStream()});
+    const std::map<uuid, std::string> written{{kind(s_cursorLocations), locationStream()},
+                                              {kind(s_appNames), appNameStream()}};
+    for (const std::string& tail : {metadata, metadata + stamp, stamp + metadata, stamp})
+        for (std::size_t length = media().size() + 1; length < media().size() + tail.size(); ++length) {
+            SCOPED_TRACE(length);
+            const std::string movie = (media() + tail).substr(0, length);
+            if (planFor(movie).state != RepairPlan::Whole) // between two atoms
+                expectSound(repaired(movie), written);
+        }
+}
+
+TEST(RepairPlan, KeepsEveryWholeEntryOfMetadataThatLacksItsLastByte) {
+    const std::string movie = media() + zulmAtom({appNameStream(), locationStream()});
+    const RepairPlan plan = planFor(movie.substr(0, movie.size() - 1));
+    EXPECT_TRUE(plan.hasLoss);
+    EXPECT_EQ(plan.finding, "the atom 'ZULM' at offset 30 declares 160 bytes, but the file ends after 159");
+    EXPECT_EQ(plan.loss, "the stream of the kind cursorLocation ends after 1 entry");
+    EXPECT_EQ(carriedOut(movie.substr(0, movie.size() - 1), plan),
+              media() + zulmAtom({appNameStream(), locationStream().substr(0, 40)}) + be32(15) + "free" +
+                  pointEntry(1.0, -3, 7).substr(8, 7));
+}
+
+TEST(RepairPlan, SetsRecordingInfoThatIsCutShortAside) {
+    const std::string whole = media() + zulmAtom({locationStream()});
+    const std::string movie = whole + extendedAtom("ZULR", std::string(64, 's'));
+    const RepairPlan plan = planFor(movie.substr(0, movie.size() - 1));
+    EXPECT_TRUE(plan.hasLoss);
+    EXPECT_EQ(plan.loss, "the name and the versions in it are incomplete and are dropped");
+    EXPECT_TRUE(repaired(movie.substr(0, movie.size() - 1)).starts_with(whole + be32(79) + "free"));
+}
+
+TEST(RepairPlan, SaysWhereAllButAHeaderIsMissing) {
+    const RepairPlan plan = planFor(media() + be32(1) + "ZULM" + be32(7));
+    expectOneChangeWithLoss(plan, 30, be32(1) + "ZULM" + be32(7), "");
+    EXPECT_EQ(plan.loss, "all of the atom but the beginning of its header is missing");
+}
+
+TEST(RepairPlan, SetsStrayBytesBehindItsOwnAtomsAside) {
+    const std::string stamp = extendedAtom("ZULR", std::string(64, '\0'));
+    for (const std::string& tail : {zulmAtom({locationStream()}), stamp})
+        for (const std::string& stray : {std::string("\n"), std::string("1234567"), std::string(7, '\0')}) {
+            const RepairPlan plan = planFor(media() + tail + stray);
+            expectOneChange(plan, 30 + tail.size(), stray, "");
+            EXPECT_THAT(plan.finding, HasSubstr("belong to no atom"));
+        }
+    for (const std::string& stray : {std::string("some text"), std::string(9, '\0'), std::string(300, '\n')}) {
+        const auto count = static_cast<std::uint32_t>(stray.size());
+        expectOneChange(planFor(media() + stamp + stray), 110, stray.substr(0, 8), be32(count) + "free");
+    }
+    const std::string torn = be32(100) + "mfra" + "index";
+    expectOneChange(planFor(media() + stamp + torn), 110, torn.substr(0, 8), be32(13) + "free");
+}
+
+TEST(RepairPlan, LeavesMediaThatIsCutShortBehindItsOwnAtoms) {
+    const std::string stamp = extendedAtom("ZULR", std::string(64, '\0'));
+    for (const char* type : {"moov", "mdat", "moof"})
+        expectUnrepairable(planFor(media() + stamp + be32(100) + type + "cut"), 110, "but the file ends after 11");
+}
+
+// No movies -------------------------------------------------------------------------------------------------------
+
+TEST(RepairPlan, TakesZerosForNoMovie) {
+    expectUnrepairable(planFor(std::string(5000, '\0')), 0, "the file does not begin like a movie");
+    expectOneChange(planFor(media() + std::string(5000, '\0')), 30, std::string(8, '\0'), be32(5000) + "free");
 }
 
 TEST(RepairPlan, NamesAnAtomByItsTypeWhereThatIsReadable) {

@@ -14,6 +14,7 @@ zulm_add_tests(ZULMetaDataTests
   StreamEntriesTest
   StreamExtentTest
   ValueTypesTest
+  WideRIFFTest
   ZULMMetaDataUUIDsTest
   ZULMMetaDataWriterTest)
 

@@ -230,6 +230,12 @@ std::string largePicture() {
     return {png.begin(), png.end()};
 }
 
+/// A movie of 106 bytes that lasts so many thousandths of a second.
+std::string movieOf(std::uint32_t milliseconds) {
+    return atom("moov",
+                atom("mvhd", be32(0) + be32(0) + be32(0) + be32(1000) + be32(milliseconds) + std::string(70, '\0')));
+}
+
 std::vector<Noticed> noticedFiles() {
     const std::string images = streamHeader(s_images, 2, 0);
     return {
@@ -243,7 +249,52 @@ std::vector<Noticed> noticedFiles() {
          riffMedia() + "ZULM" + le32(8 + 55) + "DATA" + le32(55) + streamHeader(s_unknown, 1, 31) + f64(1) +
              std::string(23, 'x')},
         {"image-not-decoded@60", s_raw, images + cursorEntry(1, largePicture())},
+        {"duplicate-stream@134", s_movie, media() + zulmAtom({locationStream(), locationStream()})},
+        {"duplicate-stream@150", s_movie, media() + zulmAtom({locationStream()}) + zulmAtom({locationStream()})},
+        {"wide-riff@0", s_riff, "RIFF" + le32(0) + "AVI " + zulmChunk({locationStream()})},
+        {"beyond-duration@178", s_movie, movieOf(600) + zulmAtom({locationStream()})},
+        {"cursor-without-image@24", s_raw, images + cursorEntry(1, "")},
     };
+}
+
+TEST(MetaDataValidator, SaysOfEachStreamHowMuchLiesBehindTheMovie) {
+    const ValidationReport report = validated(movieOf(900) + zulmAtom({locationStream(), appNameStream()}), s_movie);
+    EXPECT_EQ(report.duration, 0.9);
+    ASSERT_EQ(report.streams.size(), 2U);
+    ASSERT_EQ(report.streams[0].findings.size(), 1U);
+    EXPECT_EQ(report.streams[0].findings[0].sentence,
+              "1 entry lies after the end of the movie at 0.9 seconds, the first at 1");
+    EXPECT_EQ(validated(movieOf(2000) + zulmAtom({locationStream(), appNameStream()}), s_movie).noticeCount, 0U);
+    EXPECT_EQ(validated(movieOf(1995) + zulmAtom({appNameStream()}), s_movie).noticeCount, 0U); // rounded
+    EXPECT_EQ(validated(movieOf(0) + zulmAtom({appNameStream()}), s_movie).noticeCount, 0U);
+}
+
+TEST(MetaDataValidator, NamesEveryCursorWithoutAnImageOnce) {
+    const std::string bytes =
+        streamHeader(s_images, 2, 0) + cursorEntry(1, "") + cursorEntry(2, "") + cursorEntry(3, "");
+    EXPECT_EQ(findingsIn(bytes, s_raw), "cursor-without-image@24");
+}
+
+TEST(MetaDataValidator, LeavesOutWhatItIsToIgnore) {
+    std::istringstream stream(locationStream() + "torn");
+    EXPECT_TRUE(validateRecording(stream, s_raw).isDamaged());
+    const ValidationReport report = validateRecording(stream, s_raw, {FindingCode::TornEntry});
+    EXPECT_FALSE(report.isDamaged());
+    EXPECT_EQ(findingsOf(report), "");
+    EXPECT_EQ(report.wholeEntries, 2U);
+}
+
+TEST(MetaDataValidator, WalksRIFFFilesWithoutTheirSizeIn32Bits) {
+    const std::string ds64 = chunk("ds64", raw(std::uint64_t{4 + 36}) + std::string(20, '\0'));
+    const std::string rf64 = "RF64" + le32(0xffffffff) + "WAVE" + ds64;
+    EXPECT_EQ(findingsIn(rf64, s_riff), "");
+    EXPECT_EQ(findingsIn(rf64 + zulmChunk({locationStream()}), s_riff), "wide-riff@0");
+    for (const std::uint32_t size : {0U, 0xffffffffU}) {
+        const std::string piped = "RIFF" + le32(size) + "WAVEdata" + le32(size) + "odd";
+        EXPECT_EQ(findingsIn(piped, s_riff), "");
+        EXPECT_EQ(findingsIn(piped + '\0' + zulmChunk({locationStream()}), s_riff), "wide-riff@0");
+        EXPECT_EQ(validated(piped + '\0' + zulmChunk({locationStream()}), s_riff).streamCount, 1U);
+    }
 }
 
 TEST(MetaDataValidator, NoticesWhatIsUnusualAndCallsItNoDamage) {

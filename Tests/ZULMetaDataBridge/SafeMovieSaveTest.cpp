@@ -611,6 +611,60 @@ long peakMemoryInKilobytes() {
     return usage.ru_maxrss;
 }
 
+// The index of a fragmented movie ---------------------------------------------------------------------------------
+
+TEST_F(SafeSave, SaysWhereTheIndexOfFragmentsIs) {
+    const auto attach = [&](SafeMovieSave::FragmentIndex index) {
+        return SafeMovieSave(movie)
+            .attach({StreamSource::memory(locationStream(), "stream")}, SafeMovieSave::Existing::Refuse, index)
+            .fragmentIndex;
+    };
+    writeFile(movie, media());
+    EXPECT_EQ(attach(SafeMovieSave::FragmentIndex::MoveToEnd), FragmentIndexState::Absent);
+    writeFile(movie, media() + atom("mfra", "index"));
+    EXPECT_EQ(attach(SafeMovieSave::FragmentIndex::Leave), FragmentIndexState::NotAtEnd);
+    EXPECT_EQ(SafeMovieSave(movie).stamp("a", "1").fragmentIndex, FragmentIndexState::NotAtEnd);
+    EXPECT_EQ(SafeMovieSave(movie).stamp("a", "1", SafeMovieSave::FragmentIndex::MoveToEnd).fragmentIndex,
+              FragmentIndexState::AtEnd);
+    EXPECT_EQ(SafeMovieSave(movie).stamp("a", "1").fragmentIndex, FragmentIndexState::NotAtEnd);
+}
+
+TEST_F(SafeSave, MovesTheIndexOfFragmentsToTheEnd) {
+    for (const std::string& index : {atom("mfra", "index"), extendedAtom("mfra", std::string(1 << 19, 'i'))}) {
+        writeFile(movie, media() + index);
+        SafeMovieSave(movie).attach({StreamSource::memory(locationStream(), "stream")}, SafeMovieSave::Existing::Refuse,
+                                    SafeMovieSave::FragmentIndex::MoveToEnd);
+        std::string blank = index;
+        blank.replace(4, 4, "free");
+        EXPECT_EQ(contentsOf(movie), media() + blank + zulmAtom({locationStream()}) + index);
+    }
+}
+
+TEST_F(SafeSave, IsWhatItWasWhereverAMoveOfTheIndexFails) {
+    const std::string whole = media() + atom("mfra", std::string(5000, 'i'));
+    writeFile(movie, whole);
+    for (const std::uint64_t limit : {whole.size() + 10, whole.size() + 100, whole.size() + 2000}) {
+        const FileSizeLimit limited(limit);
+        EXPECT_THROW(SafeMovieSave(movie).attach({StreamSource::memory(locationStream(), "stream")},
+                                                 SafeMovieSave::Existing::Refuse,
+                                                 SafeMovieSave::FragmentIndex::MoveToEnd),
+                     SaveError);
+        EXPECT_EQ(contentsOf(movie), whole) << limit;
+    }
+}
+
+TEST_F(SafeSave, TakesMoviesByTheirContents) {
+    for (const std::string& bytes :
+         {riffMedia(), locationStream(), std::string(5000, '\0'), std::string("Hello, world")}) {
+        writeFile(movie, bytes);
+        EXPECT_THROW(SafeMovieSave(movie).plan(), SaveError);
+        EXPECT_THROW(SafeMovieSave(movie).stamp("a", "1"), SaveError);
+        EXPECT_EQ(contentsOf(movie), bytes);
+    }
+    writeFile(folder / "movie", media());
+    EXPECT_NO_THROW(SafeMovieSave(folder / "movie").stamp("a", "1"));
+}
+
 TEST_F(SafeSave, HoldsNoStreamInMemory) {
     constexpr std::uint64_t size = 24 + 16 * 6250000; // 100 MB
     std::vector<StreamSource> files;

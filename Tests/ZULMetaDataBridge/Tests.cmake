@@ -12,6 +12,7 @@ zulm_add_tests(ZULMetaDataBridgeTests
   ParserFamilyTest
   SafeMovieSaveTest
   StreamRedactionTest
+  StreamRetimingTest
   StreamSalvageTest
   SystemDataMetaDataTest
   WriterFamilyTest

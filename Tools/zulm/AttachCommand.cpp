@@ -1,3 +1,5 @@
+#include "Tools/zulm/AttachTimes.h"
+#include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/SavedMovie.h"
@@ -7,6 +9,8 @@
 #include <fmt/core.h>
 
 #include <algorithm>
+#include <filesystem>
+#include <fstream>
 #include <set>
 
 namespace Zulm {
@@ -23,7 +27,9 @@ struct AttachOptions {
     SaveOptions save;
     std::vector<std::string> streams;
     std::string from;
+    TimeOptions times;
     bool replace = false;
+    bool movesIndex = false;
     bool json = false;
 };
 
@@ -36,12 +42,15 @@ struct Streams {
 
 uuid typeOfStreamFile(const std::string& path) {
     requireFile(path);
-    if (MetaDataParser::streamTypeOf(path) == MetaDataParser::RawStream)
+    std::ifstream file = openInput(path);
+    const RecognizedContainer recognized = orUnreadable(path, [&] { return recognizeContainer(file, path); });
+    if (recognized.type == MetaDataParser::RawStream)
         return Recording(path).parser().getAvailableMetaDataUUIDs().front();
-    std::string text = fmt::format("{}: not a stream file (.dat)", path);
-    if (MetaDataParser::streamTypeOf(path) != MetaDataParser::Unknown)
-        text += fmt::format("; '--from {}' carries the streams of a recording over", path);
-    throw Failure(text);
+    if (recognized.type == MetaDataParser::Unknown)
+        throw Failure(fmt::format("{}: not a stream file (.dat): it {}", path, recognized.refusal()));
+    throw Failure(
+        fmt::format("{}: not a stream file (.dat) but a {}; '--from {}' carries the streams of a recording over", path,
+                    containerName(recognized.type), shellWord(path)));
 }
 
 void takeStreamFiles(const AttachOptions& options, Streams& streams) {
@@ -136,10 +145,21 @@ Json streamDocument(const AttachedStream& stream) {
     return document;
 }
 
-void report(const AttachOptions& options, const std::string& name, const AttachResult& attached) {
+/// How the times of what was attached fit the movie.
+struct TimesOutside {
+    std::uint64_t left = 0;    ///< entries after the movie's end
+    std::uint64_t removed = 0; ///< entries that --trim left out
+};
+
+void report(const AttachOptions& options, const std::string& name, const AttachResult& attached,
+            const TimesOutside& times) {
     Json file = fileHeader(options.save.movie);
     addText(file, "output", name);
-    file.update(Json{{"repair", repairDocument(attached.repair)}, {"streams", Json::array()}});
+    file.update(Json{{"repair", repairDocument(attached.repair)},
+                     {"fragment_index", fragmentIndexText(attached.fragmentIndex)},
+                     {"entries_after_end", times.left},
+                     {"entries_trimmed", times.removed},
+                     {"streams", Json::array()}});
     for (const auto& stream : attached.streams)
         file["streams"].push_back(streamDocument(stream));
     printReport("attach", Json::array({file}));
@@ -158,29 +178,41 @@ ExitCode complainAboutCuts(const AttachResult& attached) {
     return code;
 }
 
+ExitCode complainAboutNoStreams(const AttachOptions& options, ExitCode code) {
+    const std::string& name = options.from.empty() ? options.streams.front() : options.from;
+    complain(fmt::format("{}: {}; nothing was written", name,
+                         code == ExitFine ? "no recording metadata in it" : "no stream in it can be carried over"));
+    return worseOf(code, ExitNoMetaData);
+}
+
 ExitCode runAttach(const AttachOptions& options) {
-    requireMovie(options.save.movie);
+    requireFile(options.save.movie);
     const Streams streams = takeStreams(options);
-    if (streams.sources.empty()) {
-        complain(fmt::format("{}: {}; nothing was written", options.from,
-                             streams.code == ExitFine ? "no recording metadata in it"
-                                                      : "no stream in it can be carried over"));
-        return worseOf(streams.code, ExitNoMetaData);
-    }
+    if (streams.sources.empty())
+        return complainAboutNoStreams(options, streams.code);
     std::vector<std::string> inputs = options.streams;
     if (!options.from.empty())
         inputs.push_back(options.from);
     SavedMovie movie(options.save, inputs);
+    const auto duration = durationOfMovie(options.save.movie);
+    const std::string folder = std::filesystem::path(movie.name()).parent_path().string();
+    const RetimedSources retimed(streams.sources, options.times, duration, folder);
+    if (retimed.sources().empty())
+        return complainAboutNoStreams(options, ExitDamaged);
     const auto existing = options.replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse;
-    movie.examine([&](const SafeMovieSave& save) { save.checkAttach(streams.sources, existing); });
+    const auto index =
+        options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd : SafeMovieSave::FragmentIndex::Leave;
+    movie.examine([&](const SafeMovieSave& save) { save.checkAttach(retimed.sources(), existing); });
     const AttachResult attached = movie.save("attaching to " + movie.name(), [&](const SafeMovieSave& save) {
-        return save.attach(streams.sources, existing);
+        return save.attach(retimed.sources(), existing, index);
     });
+    const TimesOutside times{warnOfTimesOutside(movie.name(), duration, retimed.sources()), retimed.entriesRemoved()};
     if (options.json)
-        report(options, movie.name(), attached);
+        report(options, movie.name(), attached, times);
     else
         print(movie.name(), attached);
-    return worseOf(streams.code,
+    warnOfFragmentIndex(movie.name(), attached.fragmentIndex);
+    return worseOf(worseOf(streams.code, retimed.complainAboutCuts()),
                    worseOf(complainAboutLoss(movie.name(), attached.repair), complainAboutCuts(attached)));
 }
 
@@ -195,9 +227,12 @@ void addAttachCommand(CLI::App& app, Action& chosen) {
     command->add_flag("--replace", options->replace,
                       "Attach kinds that are there already: a stream file goes before one of OLDMOVIE, and readers "
                       "take the new one before one of MOVIE, which stays in the file unread");
+    addTimeOptions(*command, options->times);
+    addFragmentIndexOption(*command, options->movesIndex);
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm attach Movie.mp4 cursorLocation.dat slideTitles.dat -o Recording.mp4\n"
-                    "zulm attach Remuxed.mp4 --from Recording.mp4 --in-place");
+                    "zulm attach Remuxed.mp4 --from Recording.mp4 --in-place\n"
+                    "zulm attach Cut.mp4 --from Recording.mp4 --shift -12.5 --trim -o Whole.mp4");
     command->callback([options, &chosen] {
         if (options->streams.empty() && options->from.empty())
             throw CLI::RequiredError("at least one STREAM, or --from OLDMOVIE,");

@@ -33,6 +33,8 @@ void addVerifyCommand(CLI::App& app, Action& chosen);
 void addAttachCommand(CLI::App& app, Action& chosen);
 void addRepairCommand(CLI::App& app, Action& chosen);
 void addStampCommand(CLI::App& app, Action& chosen);
+void addCompactCommand(CLI::App& app, Action& chosen);
+void addDetachCommand(CLI::App& app, Action& chosen);
 void addRedactCommand(CLI::App& app, Action& chosen);
 void addExtractCommand(CLI::App& app, Action& chosen);
 void addSalvageCommand(CLI::App& app, Action& chosen);

@@ -5,7 +5,7 @@ namespace Zulm {
 std::vector<CommandGroup> commandGroups() {
     return {{"Look", {addInfoCommand, addAtomsCommand, addDumpCommand, addDiffCommand, addGrepCommand, addViewCommand}},
             {"Check and rescue", {addVerifyCommand, addRepairCommand, addSalvageCommand}},
-            {"Change", {addAttachCommand, addStampCommand, addRedactCommand}},
+            {"Change", {addAttachCommand, addStampCommand, addRedactCommand, addCompactCommand, addDetachCommand}},
             {"Convert", {addExtractCommand, addConvertCommand}},
             {"Try", {addDemoCommand}}};
 }

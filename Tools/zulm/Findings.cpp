@@ -6,6 +6,10 @@ namespace Zulm {
 
 using namespace ZULMetaData;
 
+const char* severityText(Severity severity) {
+    return severity == Severity::Notice ? "notice" : "damage";
+}
+
 std::string findingText(const Finding& finding) {
     const bool isNotice = finding.severity() == Severity::Notice;
     return fmt::format("{} at offset {}: {}{} [{}]", finding.place, finding.offset, isNotice ? "notice: " : "",
@@ -14,7 +18,7 @@ std::string findingText(const Finding& finding) {
 
 nlohmann::ordered_json findingDocument(const Finding& finding) {
     return {{"code", ruleOf(finding.code).name},
-            {"severity", finding.severity() == Severity::Notice ? "notice" : "damage"},
+            {"severity", severityText(finding.severity())},
             {"place", finding.place},
             {"offset", finding.offset},
             {"message", finding.sentence}};

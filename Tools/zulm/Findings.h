@@ -10,6 +10,9 @@
 
 namespace Zulm {
 
+/// "damage" or "notice".
+const char* severityText(ZULMetaData::Severity severity);
+
 /// "cursorLocation at offset 56: the last entry has 4 of 16 bytes [torn-entry]"
 std::string findingText(const ZULMetaData::Finding& finding);
 

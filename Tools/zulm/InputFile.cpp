@@ -12,7 +12,9 @@
 #include <cstring>
 #include <fcntl.h>
 #include <filesystem>
+#include <limits>
 #include <string_view>
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace Zulm {
@@ -50,10 +52,18 @@ void writeAll(int file, const char* bytes, std::size_t size) {
     }
 }
 
+/// Whether a path such as /dev/stdin names the pipe that standard input is.
+bool isPipeOfStandardInput(const std::string& path) {
+    struct stat named {};
+    struct stat input {};
+    return stat(path.c_str(), &named) == 0 && S_ISFIFO(named.st_mode) && fstat(STDIN_FILENO, &input) == 0 &&
+           named.st_dev == input.st_dev && named.st_ino == input.st_ino;
+}
+
 } // namespace
 
 InputFile::InputFile(const std::string& argument) : name_(argument), path_(argument) {
-    if (argument == s_standardInput)
+    if (argument == s_standardInput || isPipeOfStandardInput(path_))
         spool();
     else if (std::error_code ignored; std::filesystem::is_fifo(path_, ignored))
         throw Failure(fmt::format("{}: not a regular file; '-' reads a pipe that is standard input", path_));
@@ -67,11 +77,11 @@ InputFile::InputFile(InputFile&&) noexcept = default;
 void InputFile::spool() {
     std::array<char, 1 << 16> piece;
     std::size_t size = readInput(piece.data(), piece.size());
-    const std::string_view extension =
-        ZULMetaData::extensionFor(ZULMetaData::streamTypeOfContents({piece.data(), size}));
+    constexpr auto unknownSize = std::numeric_limits<std::uint64_t>::max();
+    const auto recognized = ZULMetaData::recognizeContainer({piece.data(), size}, unknownSize, {});
+    const std::string_view extension = ZULMetaData::extensionFor(recognized.type);
     if (extension.empty())
-        throw Failure(
-            fmt::format("{}: standard input begins neither like a movie, nor a RIFF file, nor a stream", name_));
+        throw Failure(fmt::format("{}: standard input {}", name_, recognized.refusal()));
     const std::string folder = std::filesystem::temp_directory_path().string();
     temporary_ = std::make_unique<TemporaryFile>(folder, "zulm", std::string(extension));
     path_ = temporary_->path();

@@ -1,6 +1,7 @@
 #include "Tools/zulm/Manual.h"
 
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
+#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 
 #include <fmt/core.h>
 
@@ -81,6 +82,9 @@ std::vector<std::string> ManualOption::choices() const {
     if (value == "KIND")
         for (const ZULMetaData::MetaDataKind& kind : ZULMetaData::s_metaDataKinds)
             found.emplace_back(kind.name);
+    if (value == "RULE")
+        for (const ZULMetaData::FindingRule& rule : ZULMetaData::s_findingRules)
+            found.emplace_back(rule.name);
     if (value.find('|') == std::string::npos)
         return found;
     std::istringstream stream(value);

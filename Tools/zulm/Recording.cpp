@@ -38,9 +38,7 @@ void examine(StreamInfo& info, const StreamReport& report) {
 } // namespace
 
 Recording::Recording(std::istream& input, MetaDataParser::StreamType type, std::string name) : name_(std::move(name)) {
-    parser_ = MetaDataParser::create(input, type);
-    if (!parser_)
-        throw Failure(fmt::format("{}: cannot be read", name_));
+    parser_ = orUnreadable(name_, [&] { return openContainer(input, type); });
     requireRead(parser_->getStream(), name_);
 }
 
@@ -69,7 +67,7 @@ const ValidationReport& Recording::validation() {
 }
 
 ValidationReport Recording::validate() {
-    return path_.empty() ? validateRecording(parser_->getStream(), parser_->getStreamType()) : validateRecording(path_);
+    return validateRecording(parser_->getStream(), parser_->getStreamType());
 }
 
 std::vector<StreamInfo> Recording::streams() {
@@ -113,6 +111,11 @@ std::vector<StreamInfo> Recording::hiddenStreams() {
 
 void requireRead(const std::istream& stream, const std::string& name) {
     orUnreadable(name, [&stream] { requireReadable(stream); });
+}
+
+bool isNamedOtherwise(const std::string& path, MetaDataParser::StreamType type) {
+    const MetaDataParser::StreamType named = MetaDataParser::streamTypeOf(path);
+    return named != MetaDataParser::Unknown && named != type;
 }
 
 std::string containerName(MetaDataParser::StreamType type) {

@@ -69,8 +69,8 @@ private:
 
 class Recording {
 public:
-    /// Throws `Failure` for a file that cannot be opened or is no container by its name. `name` is what it is called
-    /// towards a person; its path where that is empty.
+    /// Takes the file for what its contents say. Throws `Failure` if it cannot be opened or can hold no metadata.
+    /// `name` is what messages call the file; its path if empty.
     explicit Recording(std::string path, std::string name = {});
 
     /// Over an input of the caller that holds a container of this type, and that must outlive this.
@@ -124,6 +124,14 @@ private:
     std::unique_ptr<ZULMetaData::MetaDataParser> parser_;
     std::optional<ZULMetaData::ValidationReport> validation_;
 };
+
+/// Whether a file's name tells another container than its contents do, so that programs that go by the name fail.
+bool isNamedOtherwise(const std::string& path, ZULMetaData::MetaDataParser::StreamType type);
+
+/// Throws `Failure` if the name of `output`, which gets a container of this type, tells another one. Warns if programs
+/// that go by the name find no metadata in `output` though they did in `input`.
+void requireOutputName(const std::string& output, ZULMetaData::MetaDataParser::StreamType type,
+                       const std::string& input);
 
 /// "movie", "RIFF" or "stream".
 std::string containerName(ZULMetaData::MetaDataParser::StreamType type);

@@ -3,47 +3,40 @@
 
 #include <fmt/core.h>
 
-#include <cerrno>
-#include <cstring>
-#include <iostream>
+#include <stdexcept>
+#include <system_error>
 #include <utility>
 
 namespace Zulm {
 
 using namespace ZULMetaData;
 
-namespace {
-
-/// Keeps what is printed on a stream from being seen.
-class Muted {
-public:
-    explicit Muted(std::ostream& stream) : stream_(stream), buffer_(stream.rdbuf(nullptr)) {}
-    ~Muted() { stream_.rdbuf(buffer_); }
-    Muted(const Muted&) = delete;
-    Muted& operator=(const Muted&) = delete;
-
-private:
-    std::ostream& stream_;
-    std::streambuf* buffer_;
-};
-
-} // namespace
-
 Recording::Recording(std::string path, std::string name) : path_(std::move(path)), name_(std::move(name)) {
     if (name_.empty())
         name_ = path_;
     requireFile(path_);
-    if (MetaDataParser::streamTypeOf(path_) == MetaDataParser::Unknown)
-        throw Failure(
-            fmt::format("{}: not a movie (.mp4, .mov, .zcap), a RIFF file (.avi, .wav) or a stream (.dat)", name_));
-    {
-        const Muted libraryMessages(std::cerr); // they name no file; the tool says the same in its own words
-        parser_ = MetaDataParser::create(path_);
+    try {
+        parser_ = openContainer(path_);
+    } catch (const std::system_error& error) {
+        throw Failure(fmt::format("{}: cannot be opened: {}", name_, error.code().message()));
+    } catch (const std::runtime_error& refusal) {
+        throw Failure(fmt::format("{}: {}", name_, refusal.what()));
     }
-    if (!parser_)
-        throw Failure(fmt::format("{}: cannot be opened: {}", name_, std::strerror(errno)));
+    if (isNamedOtherwise(path_, parser_->getStreamType()))
+        warn(fmt::format("{}: is a {} by its contents, whatever its name says", name_, container()));
     requireRead(parser_->getStream(), name_);
     say(fmt::format("{}: {} with {} streams", name_, container(), parser_->getAvailableMetaDataUUIDs().size()));
+}
+
+void requireOutputName(const std::string& output, MetaDataParser::StreamType type, const std::string& input) {
+    if (isNamedOtherwise(output, type))
+        throw Failure(fmt::format("{}: is named as a {} is, but would hold a {}; choose a name that ends in {}", output,
+                                  containerName(MetaDataParser::streamTypeOf(output)), containerName(type),
+                                  extensionFor(type)));
+    const bool isUnnamed = MetaDataParser::streamTypeOf(output) == MetaDataParser::Unknown;
+    if (isUnnamed && MetaDataParser::streamTypeOf(input) == type)
+        warn(fmt::format("{}: programs that go by the name do not take it for a {}; one that ends in {} is safe",
+                         output, containerName(type), extensionFor(type)));
 }
 
 } // namespace Zulm

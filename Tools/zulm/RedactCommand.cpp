@@ -78,11 +78,6 @@ Redaction redactionFor(const RedactOptions& options) {
     return redaction;
 }
 
-void requireSameContainer(const InputFile& input, const std::string& output) {
-    if (MetaDataParser::streamTypeOf(input.path()) != MetaDataParser::streamTypeOf(output))
-        throw Failure(fmt::format("{}: not named as {} is; the extension tells the container", output, input.name()));
-}
-
 const char* removalText(RedactedStream::Removal removal) {
     switch (removal) {
     case RedactedStream::Kept: return "kept";
@@ -162,8 +157,8 @@ void print(const RedactOptions& options, const RedactedCopy& copy) {
 
 ExitCode runRedact(const RedactOptions& options) {
     const InputFile input(options.file);
-    requireSameContainer(input, options.output);
     Recording recording(input.path(), input.name());
+    requireOutputName(options.output, recording.parser().getStreamType(), input.path());
     if (heldStreams(recording).empty())
         return complainAboutNothing(recording, {});
     const Redaction redaction = redactionFor(options);

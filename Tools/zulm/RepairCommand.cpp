@@ -24,7 +24,7 @@ struct Repair {
 };
 
 RepairPlan planFor(const std::string& movie) {
-    requireMovie(movie);
+    requireFile(movie);
     try {
         return SafeMovieSave(movie).plan();
     } catch (const SaveError& error) {

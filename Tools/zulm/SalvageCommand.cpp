@@ -39,9 +39,8 @@ SalvageReport search(const std::string& path) {
     std::ifstream file = openInput(path);
     Progress progress("searching " + path, std::filesystem::file_size(path));
     return orUnreadable(path, [&] {
-        return StreamSalvage(file, MetaDataParser::streamTypeOf(path),
-                             [&](std::uint64_t done) { progress.moveTo(done); })
-            .run();
+        const MetaDataParser::StreamType type = recognizeContainer(file, path).type; // unknown ones are searched, too
+        return StreamSalvage(file, type, [&](std::uint64_t done) { progress.moveTo(done); }).run();
     });
 }
 

@@ -3,6 +3,7 @@
 #include "Tools/zulm/EndingSignals.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
+#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
@@ -40,11 +41,6 @@ std::string hexText(const std::string& bytes) {
     return text;
 }
 
-void requireMovieName(const std::string& path) {
-    if (MetaDataParser::streamTypeOf(path) != MetaDataParser::QuickTime)
-        throw Failure(fmt::format("{}: not named as a movie is (.mp4, .mov, .zcap)", path));
-}
-
 void requireRepairable(const std::string& path) {
     try {
         const RepairPlan plan = SafeMovieSave(path).plan();
@@ -65,12 +61,17 @@ const char* stateText(RepairPlan::State state) {
 
 } // namespace
 
-void addSaveOptions(CLI::App& command, SaveOptions& options) {
-    command.add_option("MOVIE", options.movie, "The movie (.mp4, .mov, .zcap)")->required();
-    auto* output = command.add_option("-o,--output", options.output, "Write a changed copy of MOVIE to this file");
+void addDestinationOptions(CLI::App& command, SaveOptions& options, const std::string& subject) {
+    auto* output = command.add_option("-o,--output", options.output,
+                                      fmt::format("Write a changed copy of {} to this file", subject));
     output->type_name("OUT");
     command.add_flag("--force", options.force, "Replace OUT where it exists")->needs(output);
-    command.add_flag("--in-place", options.inPlace, "Change MOVIE itself")->excludes(output);
+    command.add_flag("--in-place", options.inPlace, fmt::format("Change {} itself", subject))->excludes(output);
+}
+
+void addSaveOptions(CLI::App& command, SaveOptions& options) {
+    command.add_option("MOVIE", options.movie, "The movie (MP4 or QuickTime, whatever its name)")->required();
+    addDestinationOptions(command, options, "MOVIE");
 }
 
 void requireDestination(const SaveOptions& options) {
@@ -80,8 +81,9 @@ void requireDestination(const SaveOptions& options) {
 
 SavedMovie::SavedMovie(const SaveOptions& options, const std::vector<std::string>& otherInputs)
     : name_(options.inPlace ? options.movie : options.output), subject_(options.movie), path_(options.movie) {
-    requireMovie(options.movie);
-    requireMovieName(name_);
+    requireFile(options.movie);
+    if (!options.inPlace)
+        requireOutputName(name_, MetaDataParser::QuickTime, options.movie);
     if (options.inPlace)
         requireFile(options.movie, true);
     requireRepairable(options.movie);
@@ -140,14 +142,30 @@ void SavedMovie::endBy(const Interruption& interruption) const {
     throw Failure(fmt::format("{}: interrupted", name_));
 }
 
-void requireMovie(const std::string& path) {
-    requireFile(path);
-    requireMovieName(path);
+void addFragmentIndexOption(CLI::App& command, bool& isMoved) {
+    command.add_flag("--move-mfra", isMoved,
+                     "Copy the index of a fragmented movie (mfra) to the end of the file, where players look for it");
+}
+
+std::string fragmentIndexText(FragmentIndexState state) {
+    switch (state) {
+    case FragmentIndexState::NotAtEnd: return "not-at-end";
+    case FragmentIndexState::AtEnd: return "at-end";
+    default: return "none";
+    }
+}
+
+void warnOfFragmentIndex(const std::string& name, FragmentIndexState state) {
+    if (state == FragmentIndexState::NotAtEnd)
+        warn(
+            fmt::format("{}: the index of its fragments (mfra) is no longer at the end of the file, so that players do "
+                        "not find it; run the command with --move-mfra to put it there",
+                        name));
 }
 
 std::string unrepairableText(const std::string& path, const RepairPlan& plan) {
-    return fmt::format("{}: {}; nothing that is put behind it could be found. 'zulm salvage {} -o DIR' writes out "
-                       "what metadata there is",
+    return fmt::format("{}: {}; nothing that is put behind it could be found. 'zulm salvage {} -o DIR' searches it for "
+                       "metadata streams",
                        path, plan.finding, shellWord(path));
 }
 
@@ -172,15 +190,17 @@ Json repairDocument(const RepairPlan& plan) {
     document["finding"] = plan.finding;
     document["offset"] = plan.offset;
     document["loss"] = plan.hasLoss;
+    if (plan.hasLoss)
+        document["lost"] = plan.loss;
     return document;
 }
 
 ExitCode complainAboutLoss(const std::string& path, const RepairPlan& plan) {
     if (!plan.hasLoss)
         return ExitFine;
-    complain(fmt::format("{}: {}; part of it never got into the movie. 'zulm salvage {} -o DIR' writes out what "
-                         "can be found",
-                         path, plan.finding, shellWord(path)));
+    complain(
+        fmt::format("{}: {}; {}. Every whole entry is kept; 'zulm salvage {} -o DIR' searches the original for more",
+                    path, plan.finding, plan.loss, shellWord(path)));
     return ExitDamaged;
 }
 

@@ -27,6 +27,9 @@ struct SaveOptions {
 /// Adds MOVIE, -o, --force and --in-place.
 void addSaveOptions(CLI::App& command, SaveOptions& options);
 
+/// Adds -o, --force and --in-place for what the help calls `subject`.
+void addDestinationOptions(CLI::App& command, SaveOptions& options, const std::string& subject);
+
 /// Throws the usage error where it is left open which file is written.
 void requireDestination(const SaveOptions& options);
 
@@ -87,8 +90,14 @@ private:
     std::unique_ptr<OutputFile> copy_;
 };
 
-/// Throws `Failure` unless `path` is a movie, by its name, that can be opened.
-void requireMovie(const std::string& path);
+/// Adds --move-mfra.
+void addFragmentIndexOption(CLI::App& command, bool& isMoved);
+
+/// "none", "not-at-end" or "at-end".
+std::string fragmentIndexText(ZULMetaData::FragmentIndexState state);
+
+/// Warns if players no longer find the index of the fragments of the movie `name`.
+void warnOfFragmentIndex(const std::string& name, ZULMetaData::FragmentIndexState state);
 
 /// "PATH: the atom ... has an open end; ...", with what to run next.
 std::string unrepairableText(const std::string& path, const ZULMetaData::RepairPlan& plan);

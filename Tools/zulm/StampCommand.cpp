@@ -17,6 +17,7 @@ struct StampOptions {
     SaveOptions save;
     std::string creator;
     std::string version;
+    bool movesIndex = false;
     bool json = false;
 };
 
@@ -32,7 +33,9 @@ void print(const StampOptions& options, const std::string& name, const StampResu
 void report(const StampOptions& options, const std::string& name, const StampResult& stamped) {
     Json file = fileHeader(options.save.movie);
     addText(file, "output", name);
-    file.update(Json{{"repair", repairDocument(stamped.repair)}, {"creator", creatorDocument(stamped.info.creator)}});
+    file.update(Json{{"repair", repairDocument(stamped.repair)},
+                     {"creator", creatorDocument(stamped.info.creator)},
+                     {"fragment_index", fragmentIndexText(stamped.fragmentIndex)}});
     printReport("stamp", Json::array({file}));
 }
 
@@ -46,12 +49,15 @@ ExitCode complainAboutCut(const StampOptions& options, const CreatorAttributes& 
 ExitCode runStamp(const StampOptions& options) {
     SavedMovie movie(options.save, {});
     const StampResult stamped = movie.save("stamping " + movie.name(), [&](const SafeMovieSave& save) {
-        return save.stamp(options.creator, options.version);
+        return save.stamp(options.creator, options.version,
+                          options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd
+                                             : SafeMovieSave::FragmentIndex::Leave);
     });
     if (options.json)
         report(options, movie.name(), stamped);
     else
         print(options, movie.name(), stamped);
+    warnOfFragmentIndex(movie.name(), stamped.fragmentIndex);
     return worseOf(complainAboutLoss(movie.name(), stamped.repair), complainAboutCut(options, stamped.info.creator));
 }
 
@@ -73,6 +79,7 @@ void addStampCommand(CLI::App& app, Action& chosen) {
                      "The version of the creator, at most 15 bytes; it is stored")
         ->required()
         ->type_name("V");
+    addFragmentIndexOption(*command, options->movesIndex);
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm stamp Movie.mp4 --creator Recorder --creator-version 4.2 --in-place");
     command->callback([options, &chosen] {

@@ -1,3 +1,4 @@
+#include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/Findings.h"
 #include "Tools/zulm/InputFile.h"
@@ -11,6 +12,7 @@
 #include <algorithm>
 #include <functional>
 #include <memory>
+#include <set>
 #include <stdexcept>
 
 namespace Zulm {
@@ -22,20 +24,49 @@ namespace {
 
 struct VerifyOptions {
     std::vector<std::string> files;
+    std::set<FindingCode> ignored;
+    bool isStrict = false;
+    bool listsRules = false;
     bool json = false;
 };
 
+std::vector<std::string> ruleNames() {
+    std::vector<std::string> names;
+    for (const FindingRule& rule : s_findingRules)
+        names.emplace_back(rule.name);
+    return names;
+}
+
+FindingCode ruleNamed(const std::string& name) {
+    const auto found = std::find_if(s_findingRules.begin(), s_findingRules.end(),
+                                    [&](const FindingRule& rule) { return rule.name == name; });
+    if (found == s_findingRules.end())
+        throw CLI::ValidationError("--ignore", fmt::format("{} is no rule{}; 'zulm verify --rules' lists them all",
+                                                           name, suggestionFor(name, ruleNames())));
+    return found->code;
+}
+
+ExitCode listRules() {
+    for (const FindingRule& rule : s_findingRules)
+        writeOutput(fmt::format("{:<23}  {:<7}  {}\n", rule.name, severityText(rule.severity), rule.meaning));
+    return ExitFine;
+}
+
 /// Nothing else may open the file first: it is not known to be safe.
-ValidationReport validate(const InputFile& input) {
+ValidationReport validate(const InputFile& input, const std::set<FindingCode>& ignored) {
     try {
-        return validateRecording(input.path());
+        return validateRecording(input.path(), ignored);
     } catch (const std::runtime_error& error) {
         throw Failure(fmt::format("{}: {}", input.name(), error.what()));
     }
 }
 
-ExitCode exitCodeFor(const ValidationReport& report) {
-    if (report.isDamaged())
+bool isFine(const ValidationReport& report, bool isStrict) {
+    return !report.isDamaged() && !(isStrict && report.noticeCount > 0);
+}
+
+ExitCode exitCodeFor(const ValidationReport& report, bool isStrict) {
+    if (!isFine(report, isStrict))
         return ExitDamaged;
     return report.hasMetaData() ? ExitFine : ExitNoMetaData;
 }
@@ -44,17 +75,17 @@ std::string counted(std::uint64_t count, const char* one, const char* many) {
     return fmt::format("{} {}", count, count == 1 ? one : many);
 }
 
-void print(const std::string& name, const ValidationReport& report) {
+void print(const std::string& name, const ValidationReport& report, bool isStrict) {
     const auto findings = report.allFindings();
     for (const Finding& finding : findings)
         writeOutput(fmt::format("{}: {}\n", shown(name), findingText(finding)));
     if (const std::uint64_t unlisted = report.damageCount + report.noticeCount - findings.size(); unlisted > 0)
         writeOutput(
             fmt::format("{}: {} not listed\n", shown(name), counted(unlisted, "more finding is", "more findings are")));
-    if (!report.isDamaged() && report.hasMetaData())
+    if (isFine(report, isStrict) && report.hasMetaData())
         writeOutput(fmt::format("{}: ok ({}, {})\n", shown(name), counted(report.streamCount, "stream", "streams"),
                                 counted(report.wholeEntries, "entry", "entries")));
-    else if (!report.isDamaged())
+    else if (isFine(report, isStrict))
         writeOutput(fmt::format("{}: no recording metadata\n", shown(name)));
 }
 
@@ -70,16 +101,18 @@ void advise(const std::string& name, const ValidationReport& report) {
 }
 
 ExitCode runVerify(const VerifyOptions& options) {
+    if (options.listsRules)
+        return listRules();
     Json files = Json::array();
     const ExitCode code = forEachFile(options.files, [&](const std::string& path) {
         const InputFile input(path);
-        const ValidationReport report = validate(input);
+        const ValidationReport report = validate(input, options.ignored);
         if (options.json)
             files.push_back(verifyDocument(input.name(), report));
         else
-            print(input.name(), report);
+            print(input.name(), report, options.isStrict);
         advise(input.name(), report);
-        return exitCodeFor(report);
+        return exitCodeFor(report, options.isStrict);
     });
     if (options.json)
         printReport("verify", std::move(files));
@@ -91,10 +124,28 @@ ExitCode runVerify(const VerifyOptions& options) {
 void addVerifyCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<VerifyOptions>();
     CLI::App* command = app.add_subcommand("verify", "Walk every byte of the metadata and say what is damaged where");
-    command->add_option("FILE", options->files, "Movies, RIFF files or stream files; - is standard input")->required();
+    command->add_option("FILE", options->files, "Movies, RIFF files or stream files; - is standard input");
+    command->add_flag("--strict", options->isStrict, "End with 3 if there are notices, too");
+    command
+        ->add_option_function<std::vector<std::string>>(
+            "--ignore",
+            [options](const std::vector<std::string>& names) {
+                for (const std::string& name : names)
+                    options->ignored.insert(ruleNamed(name));
+            },
+            "Neither report nor count what this rule finds (repeatable); --rules lists the rules")
+        ->type_name("RULE")
+        ->expected(1)
+        ->multi_option_policy(CLI::MultiOptionPolicy::TakeAll);
+    command->add_flag("--rules", options->listsRules, "List every rule with its severity and its meaning, and end");
     command->add_flag("--json", options->json, "Print one JSON document");
-    command->footer("zulm verify Recording.mp4\nzulm verify --json *.mp4");
-    command->callback([options, &chosen] { chosen = [options] { return runVerify(*options); }; });
+    command->footer("zulm verify Recording.mp4\nzulm verify --json *.mp4\n"
+                    "zulm verify --strict --ignore several-metadata-atoms Recording.mp4");
+    command->callback([options, &chosen] {
+        if (options->files.empty() && !options->listsRules)
+            throw CLI::RequiredError("FILE");
+        chosen = [options] { return runVerify(*options); };
+    });
 }
 
 } // namespace Zulm

@@ -40,6 +40,7 @@ Json verifyDocument(const std::string& name, const ValidationReport& report) {
     Json document = fileHeader(name);
     document.update(Json{{"container", containerName(report.container)},
                          {"bytes", report.bytes},
+                         {"duration", numberDocument(report.duration)},
                          {"damaged", report.isDamaged()},
                          {"damage_count", report.damageCount},
                          {"notice_count", report.noticeCount},

@@ -1,7 +1,10 @@
 #include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 
 #include "SharedDependencies/EndianFile.h"
+#include "ZULMetaData/ContainerRecognition.h"
+#include "ZULMetaData/MovieDuration.h"
 #include "ZULMetaData/StreamExtent.h"
+#include "ZULMetaData/WideRIFF.h"
 #include "ZULMetaDataBridge/Source/Validation/ContainerWalk.h"
 #include "ZULMetaDataBridge/Source/Validation/FindingLog.h"
 #include "ZULMetaDataBridge/Source/Validation/UntrustedInput.h"
@@ -28,28 +31,44 @@ std::vector<Finding> ValidationReport::allFindings() const {
 }
 
 ValidationReport validateRecording(const FileLocation& file) {
+    return validateRecording(file, {});
+}
+
+ValidationReport validateRecording(const FileLocation& file, const std::set<FindingCode>& ignored) {
     const std::string path = utf8Path(file);
-    const MetaDataParser::StreamType type = MetaDataParser::streamTypeOf(path);
     std::ifstream stream;
     fileOpen(stream, path.c_str(), std::ios_base::in | std::ios_base::binary);
     if (!stream.is_open())
         throw std::system_error(errno, std::generic_category(), "cannot be opened");
-    return validateRecording(stream, type);
+    const RecognizedContainer recognized = recognizeContainer(stream, path);
+    if (recognized.type == MetaDataParser::Unknown)
+        throw std::runtime_error(recognized.refusal());
+    return validateRecording(stream, recognized.type, ignored);
 }
 
 ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type) {
-    stream.clear();
-    stream.seekg(0);
+    return validateRecording(stream, type, {});
+}
+
+ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type,
+                                   const std::set<FindingCode>& ignored) {
     ValidationReport report;
     report.container = type;
     report.bytes = sizeOfInput(stream);
+    report.duration = movieDuration(stream, type);
+    requireReadable(stream);
+    std::optional<detail::WideRIFF> wide;
+    if (type == MetaDataParser::Riff)
+        wide = detail::wideRIFF(stream);
+    stream.clear();
+    stream.seekg(0);
     detail::UntrustedInput input(stream, report.bytes);
-    detail::ContainerWalk walk(input, report);
+    detail::ContainerWalk walk(input, report, ignored);
     switch (type) {
     case MetaDataParser::QuickTime: walk.walkMovie(); break;
-    case MetaDataParser::Riff: walk.walkRIFF(); break;
+    case MetaDataParser::Riff: walk.walkRIFF(wide); break;
     case MetaDataParser::RawStream: walk.walkRawStream(); break;
-    default: throw std::runtime_error("not a movie, a RIFF file or a stream by its name");
+    default: throw std::runtime_error(RecognizedContainer().refusal());
     }
     return report;
 }

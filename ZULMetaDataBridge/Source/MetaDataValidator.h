@@ -16,6 +16,7 @@
 #include <cstdint>
 #include <istream>
 #include <optional>
+#include <set>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -64,6 +65,9 @@ enum class FindingCode : std::size_t {
     TimeNotFinite,
     TimeBackwards,
     NotUTF8,
+    WideRIFF,
+    BeyondDuration,
+    CursorWithoutImage,
 };
 
 /// What a code is called wherever it is shown, how bad it is, and what it means.
@@ -75,7 +79,7 @@ struct FindingRule {
 };
 
 /// By the numbers of their codes.
-inline constexpr std::array<FindingRule, 37> s_findingRules{{
+inline constexpr std::array<FindingRule, 40> s_findingRules{{
     {FindingCode::TrailingBytes, Severity::Damage, "trailing-bytes", "too few bytes for another atom or chunk"},
     {FindingCode::OpenEndedAtom, Severity::Damage, "open-ended-atom", "an atom without a size: nothing follows it"},
     {FindingCode::SizeMarker, Severity::Damage, "size-marker", "a 32-bit size that is neither a size nor the mark 1"},
@@ -89,7 +93,8 @@ inline constexpr std::array<FindingRule, 37> s_findingRules{{
     {FindingCode::ShortDataHeader, Severity::Damage, "short-data-header", "readers lose a DATA atom's last 8 bytes"},
     {FindingCode::SeveralMetaDataAtoms, Severity::Notice, "several-metadata-atoms", "more than one ZULM"},
     {FindingCode::ShortRecordingInfo, Severity::Damage, "short-recording-info", "a ZULR atom without a whole record"},
-    {FindingCode::DuplicateStream, Severity::Damage, "duplicate-stream", "a stream hides an earlier one of its kind"},
+    {FindingCode::DuplicateStream, Severity::Notice, "duplicate-stream",
+     "a stream supersedes an earlier one of its kind"},
     {FindingCode::DroppedTail, Severity::Damage, "dropped-tail", "a DATA size counts bytes that were left out"},
     {FindingCode::UnreachableStream, Severity::Damage, "unreachable-stream", "a stream that no reader finds"},
     {FindingCode::ShortHeader, Severity::Damage, "short-header", "a stream shorter than its header"},
@@ -113,6 +118,9 @@ inline constexpr std::array<FindingRule, 37> s_findingRules{{
     {FindingCode::TimeNotFinite, Severity::Damage, "time-not-finite", "a time that is no number of seconds"},
     {FindingCode::TimeBackwards, Severity::Notice, "time-backwards", "a time before the one in front of it"},
     {FindingCode::NotUTF8, Severity::Damage, "not-utf8", "a text that is not UTF-8"},
+    {FindingCode::WideRIFF, Severity::Notice, "wide-riff", "readers of 32-bit RIFF files do not find the metadata"},
+    {FindingCode::BeyondDuration, Severity::Notice, "beyond-duration", "entries after the end of the movie"},
+    {FindingCode::CursorWithoutImage, Severity::Notice, "cursor-without-image", "a cursor that had no picture before"},
 }};
 
 static_assert(
@@ -120,7 +128,7 @@ static_assert(
         for (std::size_t i = 0; i < s_findingRules.size(); ++i)
             if (s_findingRules[i].code != static_cast<FindingCode>(i))
                 return false;
-        return static_cast<std::size_t>(FindingCode::NotUTF8) + 1 == s_findingRules.size();
+        return static_cast<std::size_t>(FindingCode::CursorWithoutImage) + 1 == s_findingRules.size();
     }(),
     "one rule for every code, in their order");
 
@@ -166,8 +174,9 @@ struct ZULMETADATA_API ValidationReport {
     static constexpr std::size_t s_maximumFindings = 1000;
     static constexpr std::size_t s_maximumStreams = 1000; ///< streams in the report; more are walked, but only counted
 
-    MetaDataParser::StreamType container = MetaDataParser::Unknown; ///< by the file's extension, or as the caller said
+    MetaDataParser::StreamType container = MetaDataParser::Unknown; ///< as recognized, or as the caller said
     std::uint64_t bytes = 0;                                        ///< in the file
+    std::optional<double> duration;    ///< of the movie in seconds, as `movieDuration` returns it
     std::uint64_t streamCount = 0;     ///< `streams.size()`, or more where not all are listed
     std::uint64_t wholeEntries = 0;    ///< of all streams
     std::uint64_t damageCount = 0;     ///< findings, listed or not
@@ -180,11 +189,18 @@ struct ZULMETADATA_API ValidationReport {
     std::vector<Finding> allFindings() const;            ///< in the order of their offsets
 };
 
-/// The extension tells the container, as for `MetaDataParser`. Throws `std::runtime_error` for a file that cannot be
-/// read or is no container by its name.
+/// Takes the file for what `recognizeContainer` says. Throws `std::runtime_error` if the file cannot be read or can
+/// hold no metadata. Findings of the ignored codes are neither listed nor counted.
+///@{
 ZULMETADATA_API ValidationReport validateRecording(const FileLocation& file);
+ZULMETADATA_API ValidationReport validateRecording(const FileLocation& file, const std::set<FindingCode>& ignored);
+///@}
 
 /// Throws `std::runtime_error` for a stream that cannot be read and for the type `Unknown`.
+///@{
 ZULMETADATA_API ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type);
+ZULMETADATA_API ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type,
+                                                   const std::set<FindingCode>& ignored);
+///@}
 
 } // namespace ZULMetaData

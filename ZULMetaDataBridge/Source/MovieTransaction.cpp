@@ -37,6 +37,11 @@ std::uint64_t MovieTransaction::endAtom() {
     return size;
 }
 
+void MovieTransaction::writeAppended(std::uint64_t offset, std::span<const char> bytes) {
+    file_.writeAt(offset, bytes);
+    file_.sync();
+}
+
 void MovieTransaction::undo() {
     file_.truncate(kept_);
     file_.sync(); // an open end put back too early would swallow what is still behind it

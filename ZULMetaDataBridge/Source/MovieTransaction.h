@@ -31,6 +31,12 @@ public:
     /// Returns when the atom's bytes, and after them its size, are on the disk. Gives that size.
     std::uint64_t endAtom();
 
+    /// Returns when all that was written is on the disk.
+    void sync() { file_.sync(); }
+
+    /// Replaces bytes of what was appended. Returns when they are on the disk.
+    void writeAppended(std::uint64_t offset, std::span<const char> bytes);
+
     /// Makes the movie byte for byte what it was. Interrupted at any point, it leaves a movie that can be repaired.
     void undo();
 

@@ -1,6 +1,8 @@
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
 #include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/ContainerRecognition.h"
 #include "ZULMetaData/RecordingInfo.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 #include "ZULMetaDataBridge/Source/MovieTransaction.h"
@@ -12,6 +14,7 @@
 #include <cstring>
 #include <fstream>
 #include <memory>
+#include <optional>
 #include <system_error>
 #include <utility>
 
@@ -28,6 +31,17 @@ std::ifstream openMovie(const FileLocation& movie) {
     if (!file.is_open())
         throw SaveError(utf8Path(movie), std::string("cannot be opened: ") + std::strerror(errno));
     return file;
+}
+
+/// An empty file may yet become a movie; `repair` refuses it in words of its own.
+void requireMovie(std::ifstream& file, const FileLocation& movie) {
+    const RecognizedContainer recognized = recognizeContainer(file, utf8Path(movie));
+    if (recognized.type == MetaDataParser::QuickTime || sizeOfInput(file) == 0)
+        return;
+    throw SaveError(utf8Path(movie), recognized.type == MetaDataParser::Unknown ? recognized.refusal()
+                                     : recognized.type == MetaDataParser::Riff
+                                         ? "is a RIFF file by its contents, not a movie"
+                                         : "is a stream file by its contents, not a movie");
 }
 
 std::unique_ptr<MetaDataParser> parserOver(std::ifstream& movie) {
@@ -90,8 +104,9 @@ public:
         : movie_(movie), progress_(progress), transaction_(movie) {}
 
     RepairPlan repair();
-    AttachResult attach(std::vector<Candidate>& candidates, SafeMovieSave::Existing existing);
-    StampResult stamp(const ZCAPHeader& info);
+    AttachResult attach(std::vector<Candidate>& candidates, SafeMovieSave::Existing existing,
+                        SafeMovieSave::FragmentIndex index);
+    StampResult stamp(const ZCAPHeader& info, SafeMovieSave::FragmentIndex index);
 
     /// Runs `work`, and undoes what it did where it throws.
     template <class Work>
@@ -116,6 +131,8 @@ private:
     void verify(const std::vector<Candidate>& candidates);
     void compare(std::ifstream& movie, const Candidate& candidate);
     void read(const Candidate& candidate, std::uint64_t position, std::span<char> bytes) const;
+    FragmentIndexState treat(SafeMovieSave::FragmentIndex index);
+    void moveToEnd(const ContainerItem& index);
     void undo(const char* reason);
     void advance(std::uint64_t bytes);
 
@@ -128,6 +145,7 @@ private:
 
 RepairPlan Save::repair() {
     std::ifstream movie = openMovie(movie_);
+    requireMovie(movie, movie_);
     RepairPlan plan = planRepair(movie);
     if (transaction_.end() == 0)
         fail("is empty");
@@ -194,8 +212,54 @@ void Save::verify(const std::vector<Candidate>& candidates) {
     }
 }
 
-AttachResult Save::attach(std::vector<Candidate>& candidates, SafeMovieSave::Existing existing) {
-    AttachResult result{repair(), {}};
+/// Puts a copy at the end of the file, and then takes the old one's type away. If the program ends before it has, both
+/// are good.
+void Save::moveToEnd(const ContainerItem& index) {
+    std::ifstream movie = openMovie(movie_);
+    const ReadBytes readMovie = readingFrom(movie);
+    const std::uint64_t start = transaction_.end();
+    std::vector<char> piece(s_pieceSize);
+    inPieces(index.size, [&](std::uint64_t position, std::size_t size) {
+        const std::span<char> bytes(piece.data(), size);
+        if (readMovie(index.offset + position, bytes) != size)
+            fail("cannot be read at offset " + std::to_string(index.offset + position));
+        if (position == 0) // open-ended until it is whole
+            std::copy_n(detail::atomHeader(detail::s_freeAtom, 0).begin(), detail::s_atomHeaderSize, bytes.begin());
+        transaction_.append(bytes);
+    });
+    transaction_.sync();
+    transaction_.writeAppended(start, detail::atomHeader(detail::s_fragmentIndexAtom, index.sizeField));
+    const std::uint64_t type = index.offset + sizeof index.sizeField;
+    const auto name = [](std::uint32_t code) {
+        const auto bytes = detail::bigEndianBytes(code);
+        return std::string(bytes.begin(), bytes.end());
+    };
+    transaction_.apply({{type, name(detail::s_fragmentIndexAtom), name(detail::s_freeAtom),
+                         "The old index of the fragments becomes a 'free' atom."}});
+}
+
+FragmentIndexState Save::treat(SafeMovieSave::FragmentIndex index) {
+    std::optional<ContainerItem> found;
+    {
+        std::ifstream movie = openMovie(movie_);
+        visitTopLevel(movie, MetaDataParser::QuickTime, [&](const ContainerItem& item) {
+            if (item.type == "mfra")
+                found = item;
+            return true;
+        });
+        requireReadable(movie);
+    }
+    if (!found)
+        return FragmentIndexState::Absent;
+    if (index == SafeMovieSave::FragmentIndex::Leave)
+        return FragmentIndexState::NotAtEnd;
+    moveToEnd(*found);
+    return FragmentIndexState::AtEnd;
+}
+
+AttachResult Save::attach(std::vector<Candidate>& candidates, SafeMovieSave::Existing existing,
+                          SafeMovieSave::FragmentIndex index) {
+    AttachResult result{repair(), {}, FragmentIndexState::Absent};
     if (existing == SafeMovieSave::Existing::Refuse)
         refuseExisting(movie_, candidates);
     for (const Candidate& candidate : candidates)
@@ -204,17 +268,19 @@ AttachResult Save::attach(std::vector<Candidate>& candidates, SafeMovieSave::Exi
     for (Candidate& candidate : candidates)
         write(candidate);
     transaction_.endAtom();
+    result.fragmentIndex = treat(index);
     verify(candidates);
     for (Candidate& candidate : candidates)
         result.streams.push_back(std::move(candidate.stream));
     return result;
 }
 
-StampResult Save::stamp(const ZCAPHeader& info) {
-    StampResult result{repair(), {}};
+StampResult Save::stamp(const ZCAPHeader& info, SafeMovieSave::FragmentIndex index) {
+    StampResult result{repair(), {}, FragmentIndexState::Absent};
     transaction_.beginAtom(detail::s_recordingInfoAtom);
     transaction_.append({reinterpret_cast<const char*>(&info), sizeof info});
     transaction_.endAtom();
+    result.fragmentIndex = treat(index);
     std::ifstream movie = openMovie(movie_);
     const auto infos = readRecordingInfo(*parserOver(movie));
     requireReadable(movie);
@@ -251,6 +317,7 @@ SafeMovieSave::SafeMovieSave(FileLocation movie, Progress progress)
 RepairPlan SafeMovieSave::plan() const {
     std::ifstream movie = openMovie(movie_);
     try {
+        requireMovie(movie, movie_);
         return planRepair(movie);
     } catch (const std::system_error& error) {
         throw SaveError(utf8Path(movie_), error.what());
@@ -262,8 +329,13 @@ RepairPlan SafeMovieSave::repair() const {
 }
 
 AttachResult SafeMovieSave::attach(const std::vector<StreamSource>& streams, Existing existing) const {
+    return attach(streams, existing, FragmentIndex::Leave);
+}
+
+AttachResult SafeMovieSave::attach(const std::vector<StreamSource>& streams, Existing existing,
+                                   FragmentIndex index) const {
     std::vector<Candidate> candidates = examine(movie_, streams);
-    return save(movie_, progress_, [&](Save& work) { return work.attach(candidates, existing); });
+    return save(movie_, progress_, [&](Save& work) { return work.attach(candidates, existing, index); });
 }
 
 void SafeMovieSave::checkAttach(const std::vector<StreamSource>& streams, Existing existing) const {
@@ -273,8 +345,14 @@ void SafeMovieSave::checkAttach(const std::vector<StreamSource>& streams, Existi
 }
 
 StampResult SafeMovieSave::stamp(const std::string& creatorName, const std::string& creatorVersion) const {
-    return save(movie_, progress_,
-                [info = recordingInfo(creatorName, creatorVersion)](Save& work) { return work.stamp(info); });
+    return stamp(creatorName, creatorVersion, FragmentIndex::Leave);
+}
+
+StampResult SafeMovieSave::stamp(const std::string& creatorName, const std::string& creatorVersion,
+                                 FragmentIndex index) const {
+    return save(movie_, progress_, [info = recordingInfo(creatorName, creatorVersion), index](Save& work) {
+        return work.stamp(info, index);
+    });
 }
 
 } // namespace ZULMetaData

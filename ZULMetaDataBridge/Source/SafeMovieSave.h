@@ -57,19 +57,29 @@ struct AttachedStream {
     StreamExtent::End cutBecause = StreamExtent::AtEntry; ///< `AtEntry` where nothing was cut
 };
 
+/// What became of the index of a movie's fragments. Players look for that atom (`mfra`) at the end of the file alone.
+enum class FragmentIndexState {
+    Absent,   ///< the movie has none
+    NotAtEnd, ///< it is not at the end of the file, because of this append or an earlier one
+    AtEnd,    ///< it was moved to the end
+};
+
 /// What was done to the movie.
 struct AttachResult {
-    RepairPlan repair;                   ///< what was done before
-    std::vector<AttachedStream> streams; ///< in the order in which they were given
+    RepairPlan repair;                                             ///< what was done before
+    std::vector<AttachedStream> streams;                           ///< in the order in which they were given
+    FragmentIndexState fragmentIndex = FragmentIndexState::Absent; ///< see `SafeMovieSave::FragmentIndex`
 };
 
 /// What was done to the movie.
 struct StampResult {
-    RepairPlan repair; ///< what was done before
-    ZCAPHeader info;   ///< as it can be read back
+    RepairPlan repair;                                             ///< what was done before
+    ZCAPHeader info;                                               ///< as it can be read back
+    FragmentIndexState fragmentIndex = FragmentIndexState::Absent; ///< see `SafeMovieSave::FragmentIndex`
 };
 
-/// Every operation first repairs the movie as `planRepair` says, and throws `SaveError` where that cannot be done.
+/// Every operation takes the file for what `recognizeContainer` says and throws `SaveError` if it is no movie. It then
+/// repairs the movie as `planRepair` says, and throws `SaveError` if that cannot be done.
 /// What it appends reaches the disk before its size does, and is read back. Where anything fails, the repair included,
 /// the movie becomes byte for byte what it was, and `SaveError` is thrown. Only where even that fails is it not; the
 /// error then says so.
@@ -81,6 +91,11 @@ public:
     /// What to do about streams of kinds that the movie has already. Readers take the last one: the others would stay
     /// in the file, unread.
     enum class Existing { Refuse, Supersede };
+
+    /// What to do about an index of fragments, which is no longer at the end of the file once something is appended.
+    /// Players that use one then take longer to find a time. `MoveToEnd` copies it to the end and turns the old one
+    /// into a `free` atom.
+    enum class FragmentIndex { Leave, MoveToEnd };
 
     /// Called now and then with the bytes that were written or read back. What it throws ends and undoes the
     /// operation.
@@ -97,6 +112,7 @@ public:
     /// Appends the streams as one atom, in this order. What stands behind a stream's last whole entry is left out.
     /// Throws for a stream without a header, for two of one kind, for none at all, and see `Existing`.
     AttachResult attach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse) const;
+    AttachResult attach(const std::vector<StreamSource>& streams, Existing existing, FragmentIndex index) const;
 
     /// Throws what `attach` would for these streams, and changes nothing. For those who copy the movie first.
     void checkAttach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse) const;
@@ -104,6 +120,7 @@ public:
     /// Appends what `ZULRAtomWriter::writeZULRtoFile` does, without ever ending the process. `creatorName` is not
     /// stored: on any system the platform's name, "Mac", stands in its place.
     StampResult stamp(const std::string& creatorName, const std::string& creatorVersion) const;
+    StampResult stamp(const std::string& creatorName, const std::string& creatorVersion, FragmentIndex index) const;
 
 private:
     FileLocation movie_;

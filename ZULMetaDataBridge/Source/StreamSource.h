@@ -26,6 +26,9 @@ public:
     /// Bytes of the caller, such as `loadAllData` gives, which must outlive the source. `name` is for messages.
     static StreamSource memory(std::string_view bytes, std::string name);
 
+    /// The same bytes under another name.
+    StreamSource named(std::string name) const { return {std::move(name), open_}; }
+
     const std::string& name() const { return name_; } ///< the path of its file, or what `memory` was given
 
     /// The stream's bytes, ready to be read. Throws `std::system_error` where its file cannot be opened.

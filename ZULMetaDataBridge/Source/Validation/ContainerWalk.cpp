@@ -209,13 +209,33 @@ bool ContainerWalk::endsWithoutItsTail(const Item& atom, std::uint64_t wholeEnd,
 
 // ---- RIFF ----
 
-void ContainerWalk::walkRIFF() {
+void ContainerWalk::walkRIFF(const std::optional<WideRIFF>& wide) {
     while (input_.position() < input_.total()) {
-        const auto chunk = readChunk(input_.total(), s_file);
-        if (!chunk || !visitTopChunk(*chunk))
+        auto chunk = readChunk(input_.total(), s_file);
+        if (!chunk)
             return;
-        moveBehindChunk(*chunk, input_.total());
+        const bool isWide = wide && chunk->start == 0;
+        if (isWide)
+            chunk->size = wide->end;
+        if (!visitTopChunk(*chunk))
+            return;
+        if (isWide)
+            moveBehindWideChunk(*chunk, *wide);
+        else
+            moveBehindChunk(*chunk, input_.total());
     }
+}
+
+void ContainerWalk::moveBehindWideChunk(const Item& chunk, const WideRIFF& wide) {
+    if (wide.isDeclared || wide.end % 2 == 0)
+        moveBehindChunk(chunk, input_.total());
+    else
+        input_.moveTo(wide.end); // the end of the file
+    if (input_.position() < input_.total())
+        add(FindingCode::WideRIFF, nameOf(chunk.type), chunk.start, "its size ",
+            wide.isDeclared ? "stands in 64 bits in its ds64 chunk"
+                            : "was never set, as in a file that came from a pipe",
+            ": readers that go by the 32-bit size find no metadata after it");
 }
 
 std::optional<ContainerWalk::Item> ContainerWalk::readChunk(std::uint64_t end, std::string_view around) {
@@ -297,7 +317,7 @@ StreamWalk::Outcome ContainerWalk::walkStream(std::uint64_t declared, std::uint6
     StreamReport stream;
     stream.declaredBytes = declared;
     stream.isReachable = isReachable;
-    const auto outcome = StreamWalk(input_, log_, stream, end, std::move(isNextStream)).run();
+    const auto outcome = StreamWalk(input_, log_, stream, end, report_.duration, std::move(isNextStream)).run();
     if (!isReachable)
         log_.add(stream.findings, FindingCode::UnreachableStream, stream.name(), stream.offset,
                  "no reader finds this stream, because of the damage in front of it");
@@ -311,7 +331,8 @@ StreamWalk::Outcome ContainerWalk::walkStream(std::uint64_t declared, std::uint6
 void ContainerWalk::noteKind(StreamReport& stream) {
     if (const auto other = offsetOfKind_.find(stream.type); other != offsetOfKind_.end())
         log_.add(stream.findings, FindingCode::DuplicateStream, stream.name(), stream.offset,
-                 "readers find this stream, and no more the one of the same kind at offset ", other->second);
+                 "this stream takes the place of an earlier one of its kind at offset ", other->second,
+                 ", which no reader finds any more");
     if (report_.streamCount < ValidationReport::s_maximumStreams)
         offsetOfKind_[stream.type] = stream.offset;
 }

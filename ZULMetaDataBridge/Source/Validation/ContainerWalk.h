@@ -2,6 +2,7 @@
 
 // Validates a container around its streams: that every header makes sense and that the items fill the file.
 
+#include "ZULMetaData/WideRIFF.h"
 #include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 #include "ZULMetaDataBridge/Source/Validation/FindingLog.h"
 #include "ZULMetaDataBridge/Source/Validation/StreamWalk.h"
@@ -10,6 +11,7 @@
 #include <cstdint>
 #include <map>
 #include <optional>
+#include <set>
 #include <string>
 #include <string_view>
 
@@ -17,10 +19,12 @@ namespace ZULMetaData::detail {
 
 class ContainerWalk {
 public:
-    ContainerWalk(UntrustedInput& input, ValidationReport& report) : input_(input), report_(report), log_(report) {}
+    /// All must outlive the walk. Findings of the ignored codes are not made.
+    ContainerWalk(UntrustedInput& input, ValidationReport& report, const std::set<FindingCode>& ignored)
+        : input_(input), report_(report), log_(report, ignored) {}
 
     void walkMovie();
-    void walkRIFF();
+    void walkRIFF(const std::optional<WideRIFF>& wide);
     void walkRawStream();
 
 private:
@@ -68,6 +72,7 @@ private:
     std::optional<Item> readChunk(std::uint64_t end, std::string_view around);
     bool visitTopChunk(const Item& chunk);
     bool walkMetaDataChunk(std::uint64_t end);
+    void moveBehindWideChunk(const Item& chunk, const WideRIFF& wide);
     void moveBehindChunk(const Item& chunk, std::uint64_t end);
 
     void noteMetaData(const Item& item);

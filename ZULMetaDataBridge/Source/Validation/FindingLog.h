@@ -5,6 +5,7 @@
 #include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 
 #include <cstdint>
+#include <set>
 #include <sstream>
 #include <string>
 #include <utility>
@@ -25,11 +26,14 @@ std::string sentence(const Parts&... parts) {
 /// Counts for the whole report; the findings go to the list of the stream or the container that they are about.
 class FindingLog {
 public:
-    explicit FindingLog(ValidationReport& report) : report_(report) {}
+    /// Both must outlive the log.
+    FindingLog(ValidationReport& report, const std::set<FindingCode>& ignored) : report_(report), ignored_(ignored) {}
 
     template <class... Parts>
     void add(std::vector<Finding>& list, FindingCode code, const std::string& place, std::uint64_t offset,
              const Parts&... parts) {
+        if (ignored_.contains(code))
+            return;
         std::uint64_t& count = ruleOf(code).severity == Severity::Damage ? report_.damageCount : report_.noticeCount;
         if (count++ < ValidationReport::s_maximumFindings)
             list.push_back({code, place, offset, sentence(parts...)});
@@ -37,6 +41,7 @@ public:
 
 private:
     ValidationReport& report_;
+    const std::set<FindingCode>& ignored_;
 };
 
 } // namespace ZULMetaData::detail

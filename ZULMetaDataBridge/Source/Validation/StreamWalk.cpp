@@ -31,6 +31,9 @@ constexpr std::uint64_t memoryForImage(std::uint64_t total) {
     return 2 * total + (std::uint64_t{8} << 20);
 }
 
+/// Seconds. Movies count their duration in whole units, often of 1/600 or 1/1000 second.
+constexpr double s_durationTolerance = 0.01;
+
 } // namespace
 
 StreamWalk::Outcome StreamWalk::run() {
@@ -44,6 +47,7 @@ StreamWalk::Outcome StreamWalk::run() {
         isVersionKnown() && RecordedKinds::visit(report_.type, [this]<class Kind>() { walkKind<Kind>(); });
     if (!isWalked)
         walkUnknown();
+    reportBeyondDuration();
     return outcome_;
 }
 
@@ -248,6 +252,7 @@ bool StreamWalk::checkCursorImage(const Entry& entry) {
 }
 
 bool StreamWalk::checkCursorData(const Entry& entry, const CursorImageSchema& schema, Record& record) {
+    bool hasImage = false;
     for (const SchemaFieldStep& step : schema.GetDataSteps()) {
         if (!step.existsIn(report_.version) || !step.condition(record))
             continue;
@@ -263,7 +268,9 @@ bool StreamWalk::checkCursorData(const Entry& entry, const CursorImageSchema& sc
             checkImage(field.size);
         else
             input_.read(field.data, field.size);
+        hasImage |= isImage && field.size > 0;
     }
+    noteCursor(entry.start, record.image.uniqueId, hasImage);
     if (input_.position() < entry.end)
         add(FindingCode::LeftoverBytes, input_.position(), "the record has ", entry.end - input_.position(),
             " bytes behind its last known field");
@@ -311,9 +318,26 @@ void StreamWalk::noteTime(std::uint64_t entryStart, double time) {
         add(FindingCode::TimeBackwards, entryStart, "the entry's time ", time, " lies before ", latestTime_,
             ", a time in front of it");
     latestTime_ = time;
+    if (duration_ && *duration_ > 0 && time > *duration_ + s_durationTolerance && beyondDuration_++ == 0) {
+        firstBeyond_ = entryStart;
+        firstTimeBeyond_ = time;
+    }
     if (!report_.firstTime)
         report_.firstTime = time;
     report_.lastTime = time;
+}
+
+void StreamWalk::reportBeyondDuration() {
+    if (beyondDuration_ > 0)
+        add(FindingCode::BeyondDuration, firstBeyond_, beyondDuration_,
+            beyondDuration_ == 1 ? " entry lies" : " entries lie", " after the end of the movie at ", *duration_,
+            " seconds, the first at ", firstTimeBeyond_);
+}
+
+/// Once for each identifier.
+void StreamWalk::noteCursor(std::uint64_t entryStart, std::uint64_t identifier, bool hasImage) {
+    if (cursors_.insert(identifier).second && !hasImage)
+        add(FindingCode::CursorWithoutImage, entryStart, "the cursor ", identifier, " has no image here or before");
 }
 
 } // namespace ZULMetaData::detail

@@ -10,6 +10,8 @@
 #include <cstdint>
 #include <functional>
 #include <limits>
+#include <optional>
+#include <set>
 #include <string>
 #include <utility>
 
@@ -25,10 +27,12 @@ public:
         bool isTailLeftOut;     ///< whether the next stream begins there, so that a torn entry was never copied
     };
 
-    /// The stream stands at the position of `input` and ends at `end`, which is in the file.
+    /// The stream stands at the position of `input` and ends at `end`, which is in the file. `duration` is the movie's
+    /// in seconds, if it is known.
     StreamWalk(UntrustedInput& input, FindingLog& log, StreamReport& report, std::uint64_t end,
-               IsNextStream isNextStream)
-        : input_(input), log_(log), report_(report), end_(end), isNextStream_(std::move(isNextStream)) {}
+               std::optional<double> duration, IsNextStream isNextStream)
+        : input_(input), log_(log), report_(report), end_(end), duration_(duration),
+          isNextStream_(std::move(isNextStream)) {}
 
     Outcome run();
 
@@ -67,15 +71,22 @@ private:
     void checkImage(std::uint32_t size);
     void checkText(std::uint64_t size);
     void noteTime(std::uint64_t entryStart, double time);
+    void noteCursor(std::uint64_t entryStart, std::uint64_t identifier, bool hasImage);
+    void reportBeyondDuration();
 
     UntrustedInput& input_;
     FindingLog& log_;
     StreamReport& report_;
     std::uint64_t end_;
+    std::optional<double> duration_;
     IsNextStream isNextStream_;
     Outcome outcome_{};
     std::string place_ = "stream";
     double latestTime_ = -std::numeric_limits<double>::infinity();
+    std::uint64_t beyondDuration_ = 0; ///< entries
+    std::uint64_t firstBeyond_ = 0;    ///< its offset in the file
+    double firstTimeBeyond_ = 0;
+    std::set<std::uint64_t> cursors_; ///< identifiers that had an image or were reported
 };
 
 } // namespace ZULMetaData::detail

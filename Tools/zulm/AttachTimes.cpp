@@ -1,0 +1,124 @@
+#include "Tools/zulm/AttachTimes.h"
+
+#include "Tools/zulm/Choice.h"
+#include "Tools/zulm/OutputFile.h"
+#include "Tools/zulm/Recording.h"
+#include "Tools/zulm/TemporaryFile.h"
+#include "ZULMetaData/MovieDuration.h"
+
+#include <fmt/core.h>
+
+#include <algorithm>
+#include <cmath>
+#include <fstream>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+
+namespace {
+
+/// Seconds. Movies count their duration in whole units of their own, and the last entry may be as late as the last
+/// frame.
+constexpr double s_tolerance = 0.01;
+
+/// Appends a stream's copy. Returns nothing for one that is no stream.
+std::optional<RetimedStream> appendTo(std::ostream& output, const StreamSource& source, const Retiming& retiming) {
+    const RetimedStream stream =
+        orUnreadable(source.name(), [&] { return retimeStream(source.open(), retiming, output); });
+    if (stream.isReadable)
+        return stream;
+    if (stream.header.uuid == MetaDataHeader().uuid)
+        return std::nullopt;
+    throw Failure(fmt::format("{}: nobody here knows where the times of {} are; leave it out, or attach it without "
+                              "--shift and --trim",
+                              source.name(), metaDataKindName(stream.header.uuid)));
+}
+
+} // namespace
+
+void addTimeOptions(CLI::App& command, TimeOptions& options) {
+    addSeconds(command, "--shift", options.shift,
+               "Add so many seconds to every time of what is attached; they may be negative", Sign::Any);
+    command.add_flag("--trim", options.trims,
+                     "Leave out entries before the beginning and after the end of the movie; what is in force at the "
+                     "beginning stays");
+}
+
+RetimedSources::RetimedSources(const std::vector<StreamSource>& originals, const TimeOptions& options,
+                               std::optional<double> duration, const std::string& folder) {
+    if (!options.changesTimes()) {
+        sources_ = originals;
+        return;
+    }
+    if (options.trims && !duration)
+        throw Failure("--trim: the movie does not tell how long it lasts");
+    const Retiming retiming{options.shift.value_or(0), options.trims ? duration : std::nullopt};
+    file_ = std::make_unique<TemporaryFile>(folder.empty() ? "." : folder, "streams", ".dat");
+    std::ofstream output = openOutput(file_->path(), file_->path());
+    for (const StreamSource& original : originals) {
+        const auto begin = static_cast<std::uint64_t>(output.tellp());
+        const auto stream = appendTo(output, original, retiming);
+        const std::uint64_t size = static_cast<std::uint64_t>(output.tellp()) - begin;
+        if (!stream) {
+            sources_.push_back(original); // refused in the words of everyone who attaches it
+            continue;
+        }
+        entriesRemoved_ += stream->entriesRemoved;
+        if (stream->bytesLeftOut > 0)
+            cuts_.push_back(fmt::format("{}: {} left out {} bytes after its last whole entry", original.name(),
+                                        metaDataKindName(stream->header.uuid), stream->bytesLeftOut));
+        if (stream->entries == 0 && stream->entriesRemoved > 0)
+            warn(fmt::format("{}: no entry of {} lies in the movie; the stream is left out", original.name(),
+                             metaDataKindName(stream->header.uuid)));
+        else
+            sources_.push_back(StreamSource::part(file_->path(), begin, size).named(original.name()));
+    }
+    output.close();
+    if (!output)
+        throw Failure(fmt::format("{}: cannot be written", file_->path()));
+}
+
+RetimedSources::~RetimedSources() = default;
+
+ExitCode RetimedSources::complainAboutCuts() const {
+    for (const std::string& cut : cuts_)
+        complain(cut);
+    return cuts_.empty() ? ExitFine : ExitDamaged;
+}
+
+std::optional<double> durationOfMovie(const std::string& path) {
+    std::ifstream movie = openInput(path);
+    const auto duration = movieDuration(movie, MetaDataParser::QuickTime);
+    requireRead(movie, path);
+    return duration;
+}
+
+std::uint64_t warnOfTimesOutside(const std::string& name, std::optional<double> duration,
+                                 const std::vector<StreamSource>& sources) {
+    const double end = duration.value_or(std::numeric_limits<double>::infinity());
+    std::uint64_t after = 0;
+    std::size_t streams = 0;
+    double first = 0;
+    double last = 0;
+    for (const StreamSource& source : sources) {
+        const TimeSpan span = orUnreadable(source.name(), [&] { return timeSpanOf(source.open(), end + s_tolerance); });
+        after += span.entriesAfter;
+        streams += span.entriesAfter > 0 ? 1U : 0U;
+        first = std::min(first, span.first.value_or(0));
+        last = std::max(last, span.last.value_or(0));
+    }
+    if (after > 0)
+        warn(fmt::format(
+            "{}: {} {} of {} {} after the end of the movie at {:.3f} s, the last at {:.3f} s; --shift moves "
+            "the times, and --trim leaves such entries out",
+            name, after, after == 1 ? "entry" : "entries", streams, streams == 1 ? "stream lies" : "streams lie", end,
+            last));
+    if (first < -s_tolerance)
+        warn(fmt::format("{}: entries lie before the beginning of the movie, the first at {:.3f} s; --shift moves the "
+                         "times, and --trim leaves such entries out",
+                         name, first));
+    return after;
+}
+
+} // namespace Zulm

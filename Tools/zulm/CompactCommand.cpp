@@ -1,0 +1,136 @@
+// The commands that write a recording anew with less metadata: compact and detach.
+
+#include "Platform/DurableFile.h"
+#include "Tools/zulm/Command.h"
+#include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/MetaDataTail.h"
+#include "Tools/zulm/OutputFile.h"
+#include "Tools/zulm/Report.h"
+#include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
+
+#include <fmt/core.h>
+
+#include <filesystem>
+#include <memory>
+#include <optional>
+#include <system_error>
+
+namespace Zulm {
+
+using namespace ZULMetaData;
+using Json = nlohmann::ordered_json;
+
+namespace {
+
+struct TailOptions {
+    SaveOptions save;
+    KeptMetaData kept = KeptMetaData::Newest;
+    bool json = false;
+
+    const char* command() const { return kept == KeptMetaData::Newest ? "compact" : "detach"; }
+    const std::string& name() const { return save.inPlace ? save.movie : save.output; }
+};
+
+/// Keeps other programs of this library from changing a movie while its copy is made.
+std::optional<DurableFile> lockOf(const TailOptions& options) {
+    if (!options.save.inPlace)
+        return std::nullopt;
+    try {
+        return std::optional<DurableFile>(std::in_place, options.save.movie);
+    } catch (const std::system_error& error) {
+        throw Failure(fmt::format("{}: {}; nothing was changed", options.save.movie, error.what()));
+    }
+}
+
+/// A file in place of a link's target leaves the link alone.
+std::unique_ptr<OutputFile> outputFor(const TailOptions& options) {
+    if (options.save.inPlace)
+        return std::make_unique<OutputFile>(std::filesystem::canonical(options.save.movie).string(),
+                                            std::vector<std::string>{}, true);
+    return std::make_unique<OutputFile>(options.save.output, std::vector<std::string>{options.save.movie},
+                                        options.save.force);
+}
+
+Json streamDocument(const HeldStream& stream) {
+    return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}, {"bytes", stream.present}};
+}
+
+void report(const TailOptions& options, const MetaDataTail& tail) {
+    Json file = fileHeader(options.save.movie);
+    file.update(Json{{"output", validText(options.name())},
+                     {"bytes_before", tail.sizeBefore()},
+                     {"bytes_after", tail.sizeAfter()},
+                     {"streams_left_out", tail.streamsLeftOut()},
+                     {"creators_left_out", tail.creatorsLeftOut()},
+                     {"streams", Json::array()}});
+    for (const HeldStream& stream : tail.streams())
+        file["streams"].push_back(streamDocument(stream));
+    printReport(options.command(), Json::array({file}));
+}
+
+void print(const TailOptions& options, const MetaDataTail& tail) {
+    writeOutput(fmt::format("{}: {} stream{} left out, {} kept; {} bytes became {}\n", withoutControls(options.name()),
+                            tail.streamsLeftOut(), tail.streamsLeftOut() == 1 ? "" : "s", tail.streams().size(),
+                            tail.sizeBefore(), tail.sizeAfter()));
+}
+
+ExitCode runTail(const TailOptions& options) {
+    const std::optional<DurableFile> lock = lockOf(options);
+    const InputFile input(options.save.movie);
+    Recording recording(input.path(), input.name());
+    if (!options.save.inPlace)
+        requireOutputName(options.save.output, recording.parser().getStreamType(), input.path());
+    MetaDataTail tail(recording, options.kept);
+    const std::uint64_t streams = tail.streams().size() + tail.streamsLeftOut();
+    if (streams == 0 && tail.creatorsLeftOut() == 0)
+        return complainAboutNothing(recording, {});
+    const std::unique_ptr<OutputFile> output = outputFor(options);
+    tail.write(*output, options.name());
+    output->commit();
+    if (options.json)
+        report(options, tail);
+    else
+        print(options, tail);
+    if (tail.bytesCut() == 0)
+        return ExitFine;
+    complain(fmt::format("{}: left out {} bytes of incomplete entries", options.name(), tail.bytesCut()));
+    return ExitDamaged;
+}
+
+CLI::App* addTailCommand(CLI::App& app, Action& chosen, KeptMetaData kept, const std::string& description) {
+    auto options = std::make_shared<TailOptions>();
+    options->kept = kept;
+    CLI::App* command = app.add_subcommand(options->command(), description);
+    command->add_option("FILE", options->save.movie, "A movie or RIFF file; - is standard input")->required();
+    addDestinationOptions(*command, options->save, "FILE");
+    command->add_flag("--json", options->json, "Print one JSON document");
+    command->callback([options, &chosen] {
+        requireDestination(options->save);
+        if (options->save.inPlace && options->save.movie == "-")
+            throw CLI::ValidationError("--in-place: standard input cannot be changed; name a file, or use -o OUT");
+        chosen = [options] { return runTail(*options); };
+    });
+    return command;
+}
+
+} // namespace
+
+void addCompactCommand(CLI::App& app, Action& chosen) {
+    addTailCommand(
+        app, chosen, KeptMetaData::Newest,
+        "Write a recording anew without the streams that later ones have superseded, and without other unused "
+        "bytes of its metadata. All that readers find stays")
+        ->footer("zulm compact Recording.mp4 --in-place\nzulm compact Recording.mp4 -o Smaller.mp4");
+}
+
+void addDetachCommand(CLI::App& app, Action& chosen) {
+    addTailCommand(app, chosen, KeptMetaData::Nothing,
+                   "Write a recording anew without any metadata: all streams and the recording info go, and the movie "
+                   "becomes what it was before they were attached")
+        ->footer("zulm detach Recording.mp4 -o Movie.mp4\n"
+                 "zulm extract Recording.mp4 -o streams && zulm detach Recording.mp4 --in-place");
+}
+
+} // namespace Zulm
