@@ -71,7 +71,7 @@ void report(const TailOptions& options, const MetaDataTail& tail) {
 }
 
 void print(const TailOptions& options, const MetaDataTail& tail) {
-    writeOutput(fmt::format("{}: {} stream{} left out, {} kept; {} bytes became {}\n", withoutControls(options.name()),
+    writeOutput(fmt::format("{}: {} stream{} left out, {} kept; {} bytes became {}\n", shown(options.name()),
                             tail.streamsLeftOut(), tail.streamsLeftOut() == 1 ? "" : "s", tail.streams().size(),
                             tail.sizeBefore(), tail.sizeAfter()));
 }

@@ -29,11 +29,6 @@ std::string printable(std::string_view bytes);
 /// byte that is not UTF-8, \u{N} for any other character, and \\ for a backslash.
 std::string shown(std::string_view bytes);
 
-/// The same for names of files.
-inline std::string withoutControls(std::string_view name) {
-    return shown(name);
-}
-
 /// Returns a whole message with the same escapes. Its backslashes are doubled only if they would look like an escape
 /// otherwise, so that the commands in it (see `shellWord`) can be pasted into a shell.
 std::string shownMessage(std::string_view message);
