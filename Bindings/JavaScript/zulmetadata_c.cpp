@@ -4,8 +4,8 @@
 #include "Bindings/JavaScript/SliceBuffer.h"
 #include "Tools/zulm/DumpDocument.h"
 #include "Tools/zulm/InfoReport.h"
+#include "Tools/zulm/JsonWriter.h"
 #include "Tools/zulm/Recording.h"
-#include "Tools/zulm/Report.h"
 #include "Tools/zulm/Text.h"
 #include "Tools/zulm/VerifyReport.h"
 #include "ZULMetaData/ContainerRecognition.h"
@@ -285,14 +285,13 @@ const ZulmColumn* zulm_column(const ZulmEntries* entries, size_t index) {
 }
 
 ZulmText* zulm_info(ZulmRecording* recording) {
-    return orNull(
-        [&] { return new ZulmText{Zulm::reportText(Zulm::infoDocument(Zulm::inspect(recording->recording)))}; });
+    return orNull([&] { return new ZulmText{Zulm::jsonLines(Zulm::infoDocument(recording->recording))}; });
 }
 
 ZulmText* zulm_verify(ZulmRecording* recording) {
     return orNull([&] {
         Zulm::Recording& opened = recording->recording;
-        return new ZulmText{Zulm::reportText(Zulm::verifyDocument(opened.name(), opened.validation()))};
+        return new ZulmText{Zulm::jsonLines(Zulm::verifyDocument(opened.name(), opened.validation()))};
     });
 }
 

@@ -6,6 +6,7 @@
 #include <gmock/gmock.h>
 
 #include <csignal>
+#include <filesystem>
 
 namespace ZULMetaData::Test {
 namespace {
@@ -56,19 +57,27 @@ TEST_F(CommandLine, TellsItsVersion) {
 }
 
 TEST_F(CommandLine, RefusesWrongArguments) {
-    expectRefused({}, "which command?");
-    expectRefused({"--quiet"}, "which command?");
+    expectRefused({}, "no command is given");
+    expectRefused({"--quiet"}, "no command is given");
     expectRefused({"inof", "a.mp4"}, "no command is called inof; did you mean info?");
     expectRefused({"xyzzy"}, "no command is called xyzzy\n");
     expectRefused({"info"}, "FILE is required");
     expectRefused({"info", "--jsno", "a.mp4"}, "no option is called --jsno; did you mean --json?");
     expectRefused({"info", "--no-progres", "a.mp4"}, "did you mean --no-progress?");
-    expectRefused({"dump", "a.mp4", "b.mp4"}, "b.mp4 is one argument too many");
+    expectRefused({"repair", "a.mp4", "b.mp4"}, "b.mp4 is one argument too many");
     expectRefused({"dump", "--format", "jsn", "a.mp4"},
                   "--format: jsn is none of text, json, ndjson, csv; did you mean json?");
     expectRefused({"dump", "--from", "2", "--to", "1", "a.mp4"}, "--from: 2 is later than --to 1");
     expectRefused({"info", "--color", "sometimes", "a.mp4"}, "--color: sometimes is none of auto, always, never");
-    expectRefused({"info", "-q", "-v", "a.mp4"}, "excludes");
+    expectRefused({"info", "-q", "-v", "a.mp4"}, "--quiet cannot be given together with --verbose");
+    expectRefused({"repair", "--force", "--in-place", "a.mp4"}, "--force can only be given together with --output");
+    expectRefused({"--json", "info", "a.mp4"}, "--json is an option of 'zulm info': it follows info");
+    expectRefused({"info", "--jsno=1", "a.mp4"}, "no option is called --jsno; did you mean --json?");
+    expectRefused({"info", "--json=3", "a.mp4"}, "--json takes no value");
+    expectRefused({"info", "--quiet=no", "a.mp4"}, "--quiet takes no value");
+    expectRefused({"dump", "a.mp4", "--from"}, "--from is given without its value");
+    expectRefused({"dump", "a.mp4", "--from", "1", "--from", "2"}, "--from is given more than once");
+    expectRefused({"dump", "--stream=", "a.mp4"}, "--stream: no kind of stream is called ''");
     expectRefused({"--generate", "pdf"}, "nothing is generated as pdf");
 }
 
@@ -94,6 +103,78 @@ TEST_F(CommandLine, TakesTimeCodesForSeconds) {
     EXPECT_NE(bySeconds, "");
     EXPECT_EQ(runTool({"dump", "--from", "0:00.5", "--to", "0:16:40", file}).output, bySeconds);
     EXPECT_EQ(runTool({"dump", "--from", "-0:10", file}).output, runTool({"dump", file}).output);
+}
+
+TEST_F(CommandLine, ShowsNoHelpOfACommandThatDoesNotExist) {
+    expectRefused({"inof", "--help"}, "no command is called inof; did you mean info?");
+    expectRefused({"--help", "inof"}, "no command is called inof; did you mean info?");
+    expectRefused({"xyzzy", "a.mp4", "-h"}, "no command is called xyzzy\n");
+    expectRefused({"xyzzy", "--version"}, "no command is called xyzzy\n");
+    expectRefused({"help", "inof"}, "no command is called inof; did you mean info?");
+    EXPECT_EQ(runTool({"help"}).output, runTool({"--help"}).output);
+    EXPECT_EQ(runTool({"help", "info"}).output, runTool({"info", "--help"}).output);
+    EXPECT_EQ(runTool({"info", "a.mp4", "--help"}).exitCode, 0);
+    EXPECT_EQ(runTool({"--quiet", "--help"}).exitCode, 0);
+}
+
+TEST_F(CommandLine, MakesNoFileThatIsCalledLikeStandardOutput) {
+    ToolOptions options;
+    options.folder = folder.path().string();
+    const std::string stream = streamFile("cpuUsage");
+    for (const auto& arguments : std::vector<std::vector<std::string>>{
+             {"attach", movie(), stream, "-o", "-"},
+             {"stamp", movie(), "--creator", "a", "--creator-version", "1", "-o", "-"},
+             {"repair", movie(), "--output", "-"},
+             {"redact", movie(), "--keys", "-o", "-"},
+             {"view", movie(), "--output=-"},
+             {"extract", movie(), "-o", "-"},
+             {"salvage", movie(), "-o-"},
+             {"dump", movie(), "--images", "-"},
+             {"demo", "-"}}) {
+        const ToolResult result = runTool(arguments, options);
+        EXPECT_EQ(result.exitCode, 2) << arguments.front();
+        EXPECT_THAT(result.errors, HasSubstr("'-' does not stand for standard output here")) << arguments.front();
+    }
+    EXPECT_TRUE(std::filesystem::is_empty(folder.path()));
+    EXPECT_THAT(runTool({"convert", "--to", "srt", movie(), "-o", "-"}, options).output, StartsWith("1\n"));
+}
+
+TEST_F(CommandLine, SaysWhatIsWrongWithTheFolderForTemporaryFiles) {
+    ToolOptions options;
+    options.input = locations();
+    options.environment = {{"TMPDIR", folder / "none"}};
+    const ToolResult missing = runTool({"info", "-"}, options);
+    EXPECT_EQ(missing.exitCode, 1);
+    EXPECT_THAT(missing.errors, HasSubstr("-: standard input cannot be kept in a temporary file, because TMPDIR names "
+                                          "no folder; set it to one, or unset it"));
+}
+
+TEST_F(CommandLine, SaysWhatIsNoFile) {
+    const ToolResult folders = runTool({"info", folder.path().string()});
+    EXPECT_EQ(folders.exitCode, 1);
+    EXPECT_EQ(folders.errors, "zulm: " + folder.path().string() + ": is a folder; name the files in it\n");
+    EXPECT_EQ(runTool({"info", ""}).errors, "zulm: '' is the name of no file\n");
+}
+
+TEST_F(CommandLine, PrintsNotWhatWasDoneWhenQuiet) {
+    const std::string copy = copyOf(movie());
+    for (const auto& arguments : std::vector<std::vector<std::string>>{
+             {"attach", copy, streamFile("cpuUsage"), "--replace", "-o", folder / "attached.mp4"},
+             {"stamp", copy, "--creator", "a", "--creator-version", "1", "-o", folder / "stamped.mp4"},
+             {"repair", copy, "-o", folder / "repaired.mp4"},
+             {"redact", copy, "--keys", "-o", folder / "redacted.mp4"},
+             {"extract", copy, "-o", folder / "extracted"},
+             {"salvage", copy, "-o", folder / "salvaged"},
+             {"verify", copy}}) {
+        std::vector<std::string> quiet = arguments;
+        quiet.emplace_back("-q");
+        const ToolResult result = runTool(quiet);
+        EXPECT_EQ(result.exitCode, 0) << arguments.front();
+        EXPECT_EQ(result.output + result.errors, "") << arguments.front();
+    }
+    EXPECT_EQ(runTool({"info", "-q", copy}).output, runTool({"info", copy}).output);
+    EXPECT_EQ(runTool({"dump", "-q", copy}).output, runTool({"dump", copy}).output);
+    EXPECT_NE(runTool({"verify", "-q", damaged()}).output, "");
 }
 
 TEST_F(CommandLine, TakesAFileThatIsNamedLikeACommand) {
@@ -173,12 +254,33 @@ TEST_F(CommandLine, FailsWhenTheDiskIsFull) {
     }
 }
 
-TEST_F(CommandLine, FailsQuietlyWhenNobodyListens) {
+TEST_F(CommandLine, FailsIfStandardOutputIsClosed) {
     ToolOptions options;
     options.output = Channel::Closed;
-    const ToolResult closed = runTool({"dump", movie()}, options);
-    EXPECT_EQ(closed.exitCode, 1);
-    EXPECT_EQ(closed.errors, "");
+    for (const auto& arguments : {std::vector<std::string>{"info", movie()},
+                                  {"info", "--json", movie()},
+                                  {"dump", movie()},
+                                  {"--help"},
+                                  {"convert", "--to", "srt", movie()}}) {
+        const ToolResult result = runTool(arguments, options);
+        EXPECT_EQ(result.exitCode, 1) << arguments.front();
+        EXPECT_EQ(result.errors, "zulm: standard output: is closed, so the result could not be printed\n");
+    }
+}
+
+TEST_F(CommandLine, WritesFilesAlthoughStandardOutputIsClosed) {
+    ToolOptions options;
+    options.output = Channel::Closed;
+    const std::string captions = folder / "captions.srt";
+    EXPECT_EQ(runTool({"convert", "--to", "srt", movie(), "-o", captions}, options).exitCode, 0);
+    EXPECT_THAT(contentsOf(captions), StartsWith("1\n"));
+    const std::string copy = folder / "copy.mp4";
+    EXPECT_EQ(runTool({"-q", "redact", movie(), "-o", copy, "--keys"}, options).exitCode, 0);
+    EXPECT_EQ(runTool({"verify", copy}).exitCode, 0);
+}
+
+TEST_F(CommandLine, FailsQuietlyWhenNobodyListens) {
+    ToolOptions options;
     options.output = Channel::BrokenPipe;
     const ToolResult broken = runTool({"dump", movie()}, options);
     EXPECT_EQ(broken.exitCode, 128 + SIGPIPE);

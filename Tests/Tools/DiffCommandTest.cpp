@@ -92,6 +92,47 @@ TEST_F(DiffCommand, ListsNoMoreThanTheLimit) {
     EXPECT_EQ(differencesOf(runTool({"diff", a, b, "--json", "--limit", "0"}))["differences"].size(), 150U);
 }
 
+TEST_F(DiffCommand, ToleratesTimesThatDifferALittle) {
+    const std::string left = locations("a.dat", pointEntry(1, 1, 1) + pointEntry(2, 2, 2) + pointEntry(9, 9, 9));
+    const std::string right = locations("b.dat", pointEntry(1.01, 1, 1) + pointEntry(1.99, 2, 2) + pointEntry(9, 9, 9));
+    EXPECT_EQ(runTool({"diff", left, right}).exitCode, 3);
+    const ToolResult same = runTool({"diff", "--tolerance", "0.02", left, right});
+    EXPECT_EQ(same.exitCode, 0);
+    EXPECT_EQ(same.output, "");
+    EXPECT_EQ(runTool({"diff", "--tolerance", "0:00.005", left, right}).exitCode, 3);
+    const Json stream = differencesOf(runTool({"diff", "--json", "--tolerance", "0.02", left, right}));
+    EXPECT_EQ(stream["status"], "same");
+    EXPECT_EQ(stream["same"], 3);
+    EXPECT_TRUE(stream["differences"].empty());
+}
+
+TEST_F(DiffCommand, ToleratesNoOtherValues) {
+    const std::string left = locations("a.dat", pointEntry(1, 1, 1));
+    const std::string right = locations("b.dat", pointEntry(1.01, 1, 2));
+    const ToolResult result = runTool({"diff", "--tolerance", "0.02", left, right});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_EQ(result.output, "cursorLocation: differs\n"
+                             "  <     1.000000  x=1  y=1\n"
+                             "  >     1.010000  x=1  y=2\n"
+                             "  cursorLocation: 1 changed, 0 added, 0 removed, 0 the same\n");
+    const std::string torn = locations("c.dat", pointEntry(1.01, 1, 1) + "1234");
+    EXPECT_EQ(runTool({"diff", "--tolerance", "0.02", left, torn}).exitCode, 3);
+}
+
+TEST_F(DiffCommand, ToleratesTimesOfTexts) {
+    const std::string header = streamHeader(s_appNames, 1, 0);
+    const std::string left = write("a.dat", header + textEntry(1, "Mail") + textEntry(2, "Notes"));
+    const std::string right = write("b.dat", header + textEntry(1.25, "Mail") + textEntry(2, "Notes"));
+    EXPECT_EQ(runTool({"diff", "--tolerance", "0.5", left, right}).exitCode, 0);
+    EXPECT_EQ(runTool({"diff", "--tolerance", "0", left, right}).exitCode, 3);
+}
+
+TEST_F(DiffCommand, NamesOnlyTheStreamsWhenQuiet) {
+    const std::string left = locations("a.dat", pointEntry(1, 1, 1));
+    EXPECT_EQ(runTool({"diff", "-q", left, locations("b.dat", pointEntry(1, 1, 2))}).output,
+              "cursorLocation: differs\n");
+}
+
 TEST_F(DiffCommand, ComparesOnlyTheChosenKinds) {
     const std::string left = write("a.mp4", media() + zulmAtom({locationStream(), appNameStream()}));
     const std::string right = write("b.mp4", media() + zulmAtom({locationStream()}));

@@ -339,6 +339,67 @@ TEST_F(DumpCommand, ReadsStandardInput) {
     EXPECT_EQ(linesOf(run({"-"}, options).output).size(), 3U);
 }
 
+TEST_F(DumpCommand, PrintsSeveralFiles) {
+    written("a.dat", locations());
+    written("b.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "Mail"));
+    EXPECT_EQ(run({"a.dat", "b.dat"}).output, "a.dat: cursorLocation\n"
+                                              "    0.500000  x=10  y=-20\n    0.100000  x=0  y=7\n"
+                                              "    2.000000  x=3  y=4\n"
+                                              "b.dat: topmostAppName\n    1.000000  name=\"Mail\"\n");
+    EXPECT_EQ(run({"--format", "csv", "a.dat", "b.dat"}).output,
+              "file,stream,x,y,timestamp\n"
+              "a.dat,cursorLocation,10,-20,0.5\na.dat,cursorLocation,0,7,0.1\na.dat,cursorLocation,3,4,2.0\n\n"
+              "file,stream,name,timestamp\nb.dat,topmostAppName,Mail,1.0\n");
+    EXPECT_EQ(linesOf(run({"--format", "ndjson", "b.dat", "a.dat"}).output).front(),
+              R"({"file":"b.dat","stream":"topmostAppName","name":"Mail","timestamp":1.0})");
+    const json document = json::parse(run({"--format", "json", "a.dat", "b.dat"}).output);
+    EXPECT_EQ(document.at("files").size(), 2U);
+    EXPECT_EQ(document.at("files").at(1).at("path"), "b.dat");
+}
+
+TEST_F(DumpCommand, GoesOnAfterAFileThatCannotBeRead) {
+    written("a.dat", locations());
+    const ToolResult result = run({"--format", "ndjson", "none.dat", "a.dat"});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_EQ(linesOf(result.output).size(), 3U);
+    EXPECT_THAT(result.errors, HasSubstr("none.dat: no such file"));
+}
+
+TEST_F(DumpCommand, PrintsOnlyTheChosenColumns) {
+    written("a.dat", locations());
+    EXPECT_EQ(run({"--columns", "y,x", "--format", "csv", "a.dat"}).output, "y,x\n-20,10\n7,0\n4,3\n");
+    EXPECT_EQ(linesOf(run({"--columns", "stream,timestamp,file,y", "--format", "csv", "a.dat"}).output).at(1),
+              "cursorLocation,0.5,a.dat,-20");
+    EXPECT_EQ(linesOf(run({"--columns", "y", "a.dat"}).output).front(), "  y=-20");
+    EXPECT_EQ(linesOf(run({"--columns", "y,timestamp", "a.dat"}).output).front(), "    0.500000  y=-20");
+    EXPECT_EQ(linesOf(run({"--columns", "timestamp", "--format", "ndjson", "a.dat"}).output).at(1),
+              R"({"timestamp":0.1,"timestamp_f32":0.10000000149011612})");
+    const json document = json::parse(run({"--columns", "x", "--format", "json", "a.dat"}).output);
+    EXPECT_EQ(document.at("files").at(0).at("streams").at(0).at("entries").at(0), json({{"x", 10}}));
+}
+
+TEST_F(DumpCommand, LeavesOutStreamsWithoutTheChosenColumns) {
+    const std::vector<std::string> lines =
+        linesOf(run({"--columns", "timestamp,title", "--format", "csv", movie()}).output);
+    EXPECT_EQ(std::count(lines.begin(), lines.end(), "timestamp,title"), 2); // slide titles and window titles
+    EXPECT_EQ(run({"--columns", "hotspotOffsetX", "--stream", "slideText", movie()}).output, "");
+}
+
+TEST_F(DumpCommand, RefusesColumnsThatNoEntryHas) {
+    const ToolResult result = run({"--columns", "timestmp", "a.dat"});
+    EXPECT_EQ(result.exitCode, 2);
+    EXPECT_THAT(result.errors, HasSubstr("--columns: 'timestmp' is no column; did you mean timestamp? (the columns "
+                                         "are file, stream, timestamp, "));
+    EXPECT_EQ(run({"--columns", "", "a.dat"}).exitCode, 2);
+    EXPECT_EQ(run({"--columns", "x,,y", "a.dat"}).exitCode, 2);
+}
+
+TEST_F(DumpCommand, WritesImagesOfOneFileAtATime) {
+    const ToolResult result = run({"--images", "images", movie(), movie()});
+    EXPECT_EQ(result.exitCode, 2);
+    EXPECT_THAT(result.errors, HasSubstr("--images: the images of one FILE"));
+}
+
 TEST_F(DumpCommand, NeedsNoMoreMemoryForMoreEntries) {
     const auto memoryFor = [this](int count) {
         std::string stream = streamHeader("2b7b6af2", 1, 16);

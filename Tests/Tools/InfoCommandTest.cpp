@@ -142,7 +142,7 @@ TEST_F(InfoCommand, GoesOnBehindAFileThatCannotBeRead) {
     EXPECT_EQ(result.exitCode, 1);
     EXPECT_EQ(json::parse(result.output).at("files").size(), 1U);
     EXPECT_THAT(result.errors, HasSubstr("zulm: missing.mp4: no such file\n"));
-    EXPECT_THAT(result.errors, HasSubstr("zulm: .: not a regular file\n"));
+    EXPECT_THAT(result.errors, HasSubstr("zulm: .: is a folder; name the files in it\n"));
 }
 
 TEST_F(InfoCommand, RefusesWhatIsNoRecordingByItsName) {

@@ -7,6 +7,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <filesystem>
 #include <map>
 #include <regex>
 #include <sstream>
@@ -125,11 +126,51 @@ TEST(BashCompletion, CompletesCommandsOptionsAndChoices) {
     EXPECT_EQ(completion.ofBash("zulm dump --color ne", 3), "never\n");
 }
 
-TEST(BashCompletion, CompletesFiles) {
+/// Types into an interactive bash and prints what the tool would get: python3 has a terminal to type into.
+constexpr auto s_typing = R"(
+import os, pty, select, sys, time
+script, folder, keys = sys.argv[1:]
+child, terminal = pty.fork()
+if child == 0:
+    os.environ.update(PS1="", TERM="dumb", INPUTRC="/dev/null", HISTFILE="")
+    os.chdir(folder)
+    os.execvp("bash", ["bash", "--norc", "--noprofile", "-i"])
+output = b""
+def read_until(end):
+    global output
+    limit = time.time() + 20
+    while end not in output and time.time() < limit:
+        if select.select([terminal], [], [], 0.1)[0]:
+            output += os.read(terminal, 4096)
+    rest, output = output, b""
+    return rest
+os.write(terminal, b"stty -echo; zulm() { printf '<%s>' \"$@\"; echo END; }; source '" + script.encode() + b"'; echo REA''DY\n")
+read_until(b"READY\r\n")
+os.write(terminal, keys.encode() + b"\t\n")
+answer = read_until(b"END\r\n").decode()
+print(answer[answer.index("<"):answer.rindex(">") + 1] if "<" in answer else repr(answer))
+os.write(terminal, b"exit\n")
+)";
+
+TEST(BashCompletion, CompletesFilesWhateverTheirNames) {
     TemporaryFolder folder;
-    writeFile(folder / "Recording.mp4", "");
+    for (const std::string name : {"Recording.mp4", "My Recording.mp4", "Other's [1].mp4", "cost $5.mp4"})
+        writeFile(folder / name, "");
+    std::filesystem::create_directory(folder / "Its Folder");
     const Completion completion("bash");
-    EXPECT_EQ(completion.ofBash("zulm info " + (folder / "Rec"), 2), (folder / "Recording.mp4") + "\n");
+    const auto typed = [&](const std::string& keys) {
+        return runProgram("python3", {"-c", s_typing, completion.script(), folder.path().string(), keys}).output;
+    };
+    EXPECT_EQ(typed("zulm info Rec"), "<info><Recording.mp4>\n");
+    EXPECT_EQ(typed("zulm info My"), "<info><My Recording.mp4>\n");
+    EXPECT_EQ(typed("zulm info \"My R"), "<info><My Recording.mp4>\n");
+    EXPECT_EQ(typed("zulm info My\\ R"), "<info><My Recording.mp4>\n");
+    EXPECT_EQ(typed("zulm info Oth"), "<info><Other's [1].mp4>\n");
+    EXPECT_EQ(typed("zulm info cost"), "<info><cost $5.mp4>\n");
+    EXPECT_EQ(typed("zulm extract Recording.mp4 -o It"), "<extract><Recording.mp4><-o><Its Folder/>\n");
+    EXPECT_EQ(typed("zulm extract Recording.mp4 -o Rec"), "<extract><Recording.mp4><-o><Rec>\n");
+    EXPECT_EQ(typed("zulm dump --from Rec"), "<dump><--from><Rec>\n");
+    EXPECT_EQ(typed("zulm dump --format nd"), "<dump><--format><ndjson>\n");
 }
 
 TEST(ZshCompletion, IsAScriptThatZshReads) {

@@ -84,6 +84,7 @@ TEST_F(Schema, HoldsForDump) {
     for (const std::string& file : {movie(), odd(), strange, torn()})
         documents.push_back(
             runTool({"dump", "--format", "json", "--images", folder / "images", "--force", file}).output);
+    documents.push_back(runTool({"dump", "--format", "json", "--columns", "x,title", movie(), torn()}).output);
     expectValid(documents);
 }
 
@@ -147,6 +148,32 @@ TEST_F(Schema, HoldsForRedact) {
     expectValid({outputOf({"redact", movie(), "-o", folder / "public.mp4", "--keys", "--titles", "README", "--range",
                            "1:2", "--stream", "systemData"}),
                  outputOf({"redact", torn(), "-o", folder / "public.dat", "--range", "1:"})});
+}
+
+TEST_F(Schema, HoldsIfNothingCanBeReadOrFound) {
+    const std::string none = folder / "none\xff.mp4";
+    const std::string plain = written("plain.mp4", tinyMovie());
+    const std::string out = folder / "out.mp4";
+    for (const auto& arguments :
+         std::vector<std::vector<std::string>>{{"info"},
+                                               {"atoms"},
+                                               {"verify"},
+                                               {"grep", "a"},
+                                               {"diff", movie()},
+                                               {"extract", "-o", folder / "streams"},
+                                               {"salvage", "-o", folder / "streams"},
+                                               {"attach", "-o", out, "--from", movie()},
+                                               {"repair", "--dry-run"},
+                                               {"stamp", "-o", out, "--creator", "a", "--creator-version", "1"},
+                                               {"redact", "-o", out, "--keys"}}) {
+        std::vector<std::string> unreadable = arguments;
+        unreadable.push_back(none);
+        std::vector<std::string> empty = arguments;
+        empty.push_back(plain);
+        expectValid({outputOf(unreadable), outputOf(empty)});
+        std::filesystem::remove(out);
+    }
+    expectValid({runTool({"dump", "--format", "json", none, plain}).output});
 }
 
 TEST_F(Schema, HoldsForWhatPagesHold) {

@@ -28,6 +28,8 @@ zulm_add_tests(ToolsTests
   ExtractCommandTest
   GrepCommandTest
   InfoCommandTest
+  JsonReportTest
+  JsonWriterTest
   ManualTest
   NumberTest
   OutOfMemoryTest

@@ -2,7 +2,7 @@
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/Layout.h"
 #include "Tools/zulm/Recording.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 
@@ -32,25 +32,30 @@ Json itemDocument(const LayoutItem& entry) {
         document["stream"] = {{"kind", kindDocument(*entry.stream)}, {"uuid", uuidText(*entry.stream)}};
     if (entry.isForeign)
         document["foreign"] = true;
-    if (entry.isMetaData) {
-        document["children"] = Json::array();
-        for (const LayoutItem& child : entry.children)
-            document["children"].push_back(itemDocument(child));
-    }
     return document;
 }
 
-Json fileDocument(const Recording& recording, const Layout& layout) {
-    Json document = fileHeader(recording.name());
-    document.update(Json{{"container", recording.container()},
-                         {"bytes", layout.fileSize},
-                         {"items", Json::array()},
-                         {"ends", Json::array()}});
-    for (const LayoutItem& item : layout.items)
-        document["items"].push_back(itemDocument(item));
-    for (const LayoutEnd& end : layout.ends)
-        document["ends"].push_back({{"offset", end.offset}, {"reason", end.reason}});
-    return document;
+/// A file may hold millions of atoms, so they are written as they are met; where they end is found by a second walk.
+void writeReport(Recording& recording, const LayoutVisitor& ends, JsonWriter& writer) {
+    writer.beginObject();
+    writer.members(fileHeader(recording.name()));
+    writer.member("container", recording.container());
+    writer.member("bytes", recording.size());
+    writer.beginArray("items");
+    const auto begin = [&](const LayoutItem& item, bool) {
+        if (!item.isMetaData)
+            return writer.element(itemDocument(item));
+        writer.beginObject();
+        writer.members(itemDocument(item));
+        writer.beginArray("children");
+    };
+    const std::size_t depth = writer.depth();
+    walkLayout(recording, LayoutPart::Whole, {begin, [&] { writer.endTo(depth); }});
+    writer.end();
+    writer.beginArray("ends");
+    walkLayout(recording, LayoutPart::MetaData, ends);
+    writer.end();
+    writer.end();
 }
 
 std::string remarkOn(const LayoutItem& entry) {
@@ -59,50 +64,50 @@ std::string remarkOn(const LayoutItem& entry) {
     return entry.isForeign ? "foreign" : "";
 }
 
-void printItem(const LayoutItem& entry, int depth) {
-    const std::string type = std::string(static_cast<std::size_t>(2 * depth), ' ') + printable(entry.item.type);
+void printItem(const LayoutItem& entry, bool isChild) {
+    const std::string type = (isChild ? "  " : "") + printable(entry.item.type);
     std::string line = fmt::format("  {:<12}  {:>16}  {:>16}  {:<10}  {}", type, entry.item.offset, entry.size,
                                    entry.headerForm(), remarkOn(entry));
     line.erase(line.find_last_not_of(' ') + 1);
     writeOutput(line + '\n');
-    for (const LayoutItem& child : entry.children)
-        printItem(child, depth + 1);
 }
 
-void print(const Recording& recording, const Layout& layout) {
-    writeOutput(fmt::format("{}: {}, {} bytes\n", shown(recording.name()), recording.container(), layout.fileSize));
+void print(Recording& recording, const LayoutVisitor& ends) {
+    writeOutput(fmt::format("{}: {}, {} bytes\n", shown(recording.name()), recording.container(), recording.size()));
     writeOutput(
         heading(fmt::format("  {:<12}  {:>16}  {:>16}  {:<10}  {}", "type", "offset", "size", "header", "stream")) +
         '\n');
-    for (const LayoutItem& item : layout.items)
-        printItem(item, 0);
-    for (const LayoutEnd& end : layout.ends)
-        writeOutput(fmt::format("  ends at {}: {}\n", end.offset, end.reason));
+    walkLayout(recording, LayoutPart::Whole, {printItem});
+    walkLayout(recording, LayoutPart::MetaData, ends);
 }
 
-ExitCode showAtoms(const std::string& path, const AtomsOptions& options, Json& files) {
+ExitCode showAtoms(const std::string& path, RunReport& report) {
     const InputFile input(path);
     Recording recording(input.path(), input.name());
     if (recording.parser().getStreamType() == MetaDataParser::RawStream)
         throw Failure(
             fmt::format("{}: a bare stream has no atoms; 'zulm info {}' shows what it is", path, shellWord(path)));
-    const Layout layout = layoutOf(recording);
-    for (const LayoutEnd& end : layout.ends)
-        warnAbout(path, fmt::format("the walk ends at offset {}: {}", end.offset, end.reason));
-    if (options.json)
-        files.push_back(fileDocument(recording, layout));
+    ExitCode code = ExitFine;
+    LayoutVisitor ends;
+    ends.end = [&](const LayoutEnd& end) {
+        code = ExitDamaged;
+        warn(fmt::format("{}: the walk ends at offset {}: {}", path, end.offset, end.reason));
+        if (report.isWanted())
+            report.writer().element({{"offset", end.offset}, {"reason", end.reason}});
+        else
+            writeOutput(fmt::format("  ends at {}: {}\n", end.offset, end.reason));
+    };
+    if (report.isWanted())
+        writeReport(recording, ends, report.writer());
     else
-        print(recording, layout);
-    return layout.ends.empty() ? ExitFine : ExitDamaged;
+        print(recording, ends);
+    return code;
 }
 
 ExitCode runAtoms(const AtomsOptions& options) {
-    Json files = Json::array();
-    const ExitCode code =
-        forEachFile(options.files, [&](const std::string& path) { return showAtoms(path, options, files); });
-    if (options.json)
-        printReport("atoms", std::move(files));
-    return code;
+    return withReport("atoms", options.json, options.files, [&](RunReport& report) {
+        return forEachFile(options.files, [&](const std::string& path) { return showAtoms(path, report); });
+    });
 }
 
 } // namespace

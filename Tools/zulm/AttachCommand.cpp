@@ -1,8 +1,9 @@
 #include "Tools/zulm/AttachTimes.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Recording.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 
@@ -151,8 +152,8 @@ struct TimesOutside {
     std::uint64_t removed = 0; ///< entries that --trim left out
 };
 
-void report(const AttachOptions& options, const std::string& name, const AttachResult& attached,
-            const TimesOutside& times) {
+Json fileDocument(const AttachOptions& options, const std::string& name, const AttachResult& attached,
+                  const TimesOutside& times) {
     Json file = fileHeader(options.save.movie);
     addText(file, "output", name);
     file.update(Json{{"repair", repairDocument(attached.repair)},
@@ -162,7 +163,7 @@ void report(const AttachOptions& options, const std::string& name, const AttachR
                      {"streams", Json::array()}});
     for (const auto& stream : attached.streams)
         file["streams"].push_back(streamDocument(stream));
-    printReport("attach", Json::array({file}));
+    return file;
 }
 
 ExitCode complainAboutCuts(const AttachResult& attached) {
@@ -185,7 +186,7 @@ ExitCode complainAboutNoStreams(const AttachOptions& options, ExitCode code) {
     return worseOf(code, ExitNoMetaData);
 }
 
-ExitCode runAttach(const AttachOptions& options) {
+ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     requireFile(options.save.movie);
     const Streams streams = takeStreams(options);
     if (streams.sources.empty())
@@ -207,13 +208,19 @@ ExitCode runAttach(const AttachOptions& options) {
         return save.attach(retimed.sources(), existing, index);
     });
     const TimesOutside times{warnOfTimesOutside(movie.name(), duration, retimed.sources()), retimed.entriesRemoved()};
-    if (options.json)
-        report(options, movie.name(), attached, times);
-    else
+    if (report.isWanted())
+        report.add(fileDocument(options, movie.name(), attached, times));
+    else if (!settings().quiet)
         print(movie.name(), attached);
     warnOfFragmentIndex(movie.name(), attached.fragmentIndex);
     return worseOf(worseOf(streams.code, retimed.complainAboutCuts()),
                    worseOf(complainAboutLoss(movie.name(), attached.repair), complainAboutCuts(attached)));
+}
+
+ExitCode runAttach(const AttachOptions& options) {
+    std::vector<std::string> files{options.save.movie, options.save.output, options.from};
+    files.insert(files.end(), options.streams.begin(), options.streams.end());
+    return withReport("attach", options.json, files, [&](RunReport& report) { return attachStreams(options, report); });
 }
 
 } // namespace

@@ -1,6 +1,7 @@
 #include "Tools/zulm/Command.h"
 
 #include "SharedDependencies/EndianFile.h"
+#include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/Text.h"
 
@@ -14,6 +15,8 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <new>
+#include <system_error>
 
 namespace Zulm {
 
@@ -32,6 +35,8 @@ void printLine(const std::string& lead, fmt::color color, const std::string& mes
 
 void complain(const std::string& message) {
     printLine("zulm:", fmt::color::red, shownMessage(message));
+    if (RunReport* report = RunReport::current())
+        report->noteComplaint(message);
 }
 
 void warn(const std::string& message) {
@@ -55,15 +60,29 @@ ExitCode worseOf(ExitCode left, ExitCode right) {
     return rank(left) < rank(right) ? right : left;
 }
 
+ExitCode orComplaint(const Action& work) {
+    try {
+        return work();
+    } catch (const Failure& failure) {
+        complain(failure.what());
+    } catch (const std::bad_alloc&) {
+        complain("out of memory");
+    } catch (const std::filesystem::filesystem_error& error) {
+        complain(fmt::format("{}: {}", error.path1().string(), error.code().message()));
+    } catch (const std::system_error&) {
+        throw;
+    } catch (const std::exception& error) {
+        complain(error.what());
+    }
+    return ExitFailed;
+}
+
 ExitCode forEachFile(const std::vector<std::string>& files, const std::function<ExitCode(const std::string&)>& work) {
     ExitCode worst = ExitFine;
     for (const std::string& file : files) {
-        try {
-            worst = worseOf(worst, work(file));
-        } catch (const Failure& failure) {
-            complain(failure.what());
-            worst = worseOf(worst, ExitFailed);
-        }
+        if (RunReport* report = RunReport::current())
+            report->workOn(file);
+        worst = worseOf(worst, orComplaint([&] { return work(file); }));
     }
     return worst;
 }
@@ -71,10 +90,14 @@ ExitCode forEachFile(const std::vector<std::string>& files, const std::function<
 void requireFile(const std::string& path, bool forWriting) {
     std::error_code error;
     const auto status = std::filesystem::status(path, error);
+    if (path.empty())
+        throw Failure("'' is the name of no file");
     if (status.type() == std::filesystem::file_type::not_found)
         throw Failure(fmt::format("{}: no such file", path));
     if (error)
         throw Failure(fmt::format("{}: {}", path, error.message()));
+    if (std::filesystem::is_directory(status))
+        throw Failure(fmt::format("{}: is a folder; name the files in it", path));
     if (!std::filesystem::is_regular_file(status))
         throw Failure(fmt::format("{}: not a regular file", path));
     const auto mode = forWriting ? std::ios::in | std::ios::out : std::ios::in;

@@ -56,8 +56,12 @@ void say(const std::string& message);
 /// The worse of two ends, for a command that works on several files.
 ExitCode worseOf(ExitCode left, ExitCode right);
 
-/// Runs `work` on one file after the other, whatever happens to the ones before. A `Failure` becomes a complaint. Gives
-/// the worst end.
+/// Runs `work`. A `Failure` or another exception becomes a complaint and `ExitFailed`. Throws only `std::system_error`,
+/// which standard output throws if it cannot be written.
+ExitCode orComplaint(const Action& work);
+
+/// Runs `work` on one file after the other, whatever happens to the ones before. A `Failure` becomes a complaint.
+/// Returns the worst end.
 ExitCode forEachFile(const std::vector<std::string>& files, const std::function<ExitCode(const std::string&)>& work);
 
 /// Fails unless `path` is a regular file that can be opened; `forWriting` asks for that too.

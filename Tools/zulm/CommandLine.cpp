@@ -3,18 +3,16 @@
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Help.h"
 #include "Tools/zulm/Manual.h"
-#include "Tools/zulm/OutOfMemory.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <filesystem>
 #include <iterator>
 #include <memory>
-#include <new>
 #include <sstream>
+#include <string_view>
 #include <system_error>
 #include <utility>
 
@@ -37,26 +35,65 @@ std::vector<std::string> optionNames(const CLI::App& app) {
     return names;
 }
 
+bool isOneOf(const std::vector<std::string>& names, const std::string& name) {
+    return std::find(names.begin(), names.end(), name) != names.end();
+}
+
 /// The command that was named, or the tool itself.
 const CLI::App& namedCommand(const CLI::App& app) {
     const auto commands = app.get_subcommands();
     return commands.empty() ? app : *commands.front();
 }
 
+bool isOption(const std::string& word) {
+    return word.starts_with("-");
+}
+
+/// Whether a word stands where a command is expected, and is none.
+bool namesNoCommand(const CLI::App& app) {
+    const auto words = app.remaining(true);
+    return app.get_subcommands().empty() && !std::all_of(words.begin(), words.end(), isOption);
+}
+
 std::string unexpectedText(const CLI::App& app) {
     const CLI::App& command = namedCommand(app);
     const auto words = app.remaining(true);
-    const auto isOption = [](const std::string& word) { return word.starts_with("-"); };
-    const auto isCommand = [&](const std::string& word) { return &command == &app && !isOption(word); };
-    const auto word = std::find_if(words.begin(), words.end(), isCommand);
-    if (word != words.end())
+    const auto word = std::find_if_not(words.begin(), words.end(), isOption);
+    if (namesNoCommand(app))
         return fmt::format("no command is called {}{}", *word, suggestionFor(*word, commandNames(app)));
     const std::string& first = words.front();
+    if (!isOption(first))
+        return fmt::format("{} is one argument too many", first);
+    const std::string name = first.substr(0, first.find('='));
     auto names = optionNames(command);
-    for (const std::string& name : optionNames(app))
-        names.push_back(name);
-    return isOption(first) ? fmt::format("no option is called {}{}", first, suggestionFor(first, names))
-                           : fmt::format("{} is one argument too many", first);
+    if (isOneOf(names, name))
+        return fmt::format("{0} is an option of 'zulm {1}': it follows {1}", name, command.get_name());
+    for (const std::string& global : optionNames(app))
+        names.push_back(global);
+    return fmt::format("no option is called {}{}", name, suggestionFor(name, names));
+}
+
+/// What is wrong with the values of an option, or with options that are given together, in words that say what to do.
+/// The parser's own words are all that tells these errors apart.
+std::string usageText(const CLI::ParseError& error) {
+    const std::string text = error.what();
+    const auto has = [&text](const char* words) { return text.find(words) != std::string::npos; };
+    const auto replaced = [&text](std::string_view words, const char* better) {
+        const std::size_t position = text.find(words);
+        return text.substr(0, position) + better + text.substr(position + words.size());
+    };
+    const std::string name = text.substr(0, text.find_first_of(": "));
+    if (dynamic_cast<const CLI::ArgumentMismatch*>(&error) && has(" missing"))
+        return fmt::format("{} is given without its value", name);
+    if (dynamic_cast<const CLI::ArgumentMismatch*>(&error) && has("At Most"))
+        return fmt::format("{} is given more than once", name);
+    if (dynamic_cast<const CLI::ArgumentMismatch*>(&error) && has("flag override"))
+        return fmt::format("{} takes no value", name);
+    if (dynamic_cast<const CLI::ExcludesError*>(&error) && has(" excludes "))
+        return replaced(" excludes ", " cannot be given together with ");
+    if (dynamic_cast<const CLI::RequiresError*>(&error) && has(" requires "))
+        return replaced(" requires ", " can only be given together with ");
+    return text;
 }
 
 ExitCode refuse(const CLI::App& app, const std::string& message) {
@@ -68,24 +105,16 @@ ExitCode refuse(const CLI::App& app, const std::string& message) {
 
 ExitCode refuse(const CLI::App& app, const CLI::ParseError& error) {
     const bool isUnexpected = dynamic_cast<const CLI::ExtrasError*>(&error) && !app.remaining(true).empty();
-    return refuse(app, isUnexpected ? unexpectedText(app) : error.what());
+    return refuse(app, isUnexpected ? unexpectedText(app) : usageText(error));
 }
 
 ExitCode run(const Action& action) {
     try {
-        return action();
-    } catch (const Failure& failure) {
-        complain(failure.what());
-    } catch (const std::bad_alloc&) {
-        complainAboutMemory();
-    } catch (const std::filesystem::filesystem_error& error) {
-        complain(fmt::format("{}: {}", error.path1().string(), error.code().message()));
-    } catch (const std::system_error& error) { // only output is written by what throws this
+        return orComplaint(action);
+    } catch (const std::system_error& error) { // only standard output throws this
         complainAboutOutput(error.code().value());
-    } catch (const std::exception& error) {
-        complain(error.what());
+        return ExitFailed;
     }
-    return ExitFailed;
 }
 
 ExitCode print(const std::string& text) {
@@ -107,11 +136,12 @@ ExitCode generate(const CLI::App& app, const std::string& format) {
 }
 
 /// The words after the program's name. An option with an empty value ("--titles=") becomes two words, because the
-/// parser would take the next word as its value.
+/// parser would take the next word as its value. "help COMMAND" becomes "COMMAND --help".
 std::vector<std::string> wordsOf(int argc, char** argv) {
     std::vector<std::string> words;
+    const bool asksForHelp = argc > 1 && std::string_view(argv[1]) == "help";
     bool areOptions = true;
-    for (int i = 1; i < argc; ++i) {
+    for (int i = asksForHelp ? 2 : 1; i < argc; ++i) {
         std::string word = argv[i];
         areOptions = areOptions && word != "--";
         const bool hasEmptyValue = areOptions && word.starts_with("--") && word.find('=') == word.size() - 1;
@@ -121,12 +151,33 @@ std::vector<std::string> wordsOf(int argc, char** argv) {
         if (hasEmptyValue)
             words.emplace_back();
     }
+    if (asksForHelp)
+        words.emplace_back("--help");
     return words;
 }
 
 constexpr auto s_examples = "zulm info Recording.mp4                                   # what is in it\n"
                             "zulm verify Recording.mp4 || zulm salvage Recording.mp4 -o rescued\n"
                             "zulm dump --stream cursorLocation --format csv Recording.mp4 > cursor.csv";
+
+/// A flag is given or not: the parser would take "--json=false" too, and "--json=3".
+void refuseValuesOfFlags(CLI::App& app) {
+    for (CLI::Option* option : app.get_options())
+        if (option->get_type_size() == 0)
+            option->disable_flag_override();
+}
+
+/// What is put in place when it is whole cannot go to standard output, and nobody means a file that is called "-".
+void refuseStandardOutput(CLI::App& command) {
+    const auto refused = [](const std::string& path) {
+        return path == "-" ? std::string("'-' does not stand for standard output here; name a file or a folder ('./-' "
+                                         "is one that is called so)")
+                           : std::string();
+    };
+    for (CLI::Option* option : command.get_options())
+        if (option->get_type_name() == "OUT" || option->get_type_name() == "DIR" || option->get_name() == "DIR")
+            option->check(CLI::Validator(refused, ""));
+}
 
 void define(CLI::App& app, Action& chosen, const std::vector<CommandGroup>& groups) {
     app.set_version_flag("--version", "zulm " ZULM_VERSION, "Print the version and end");
@@ -138,8 +189,14 @@ void define(CLI::App& app, Action& chosen, const std::vector<CommandGroup>& grou
     for (const CommandGroup& group : groups)
         for (const auto addCommand : group.commands) {
             addCommand(app, chosen);
-            app.get_subcommands([](CLI::App*) { return true; }).back()->group(group.heading);
+            CLI::App* command = app.get_subcommands([](CLI::App*) { return true; }).back();
+            command->group(group.heading);
+            if (command->get_name() != "convert") // its result is text that is written when it is whole
+                refuseStandardOutput(*command);
         }
+    refuseValuesOfFlags(app);
+    for (CLI::App* command : app.get_subcommands([](CLI::App*) { return true; }))
+        refuseValuesOfFlags(*command);
     app.footer(s_examples); // last: commands would inherit it
 }
 
@@ -157,13 +214,13 @@ ExitCode runCommandLine(int argc, char** argv, const std::vector<CommandGroup>& 
         std::reverse(words.begin(), words.end()); // the parser takes them from the end
         app.parse(std::move(words));
     } catch (const CLI::Success& shown) { // help or version
-        return print(app, shown);
+        return namesNoCommand(app) ? refuse(app, unexpectedText(app)) : print(app, shown);
     } catch (const CLI::ParseError& error) {
         return refuse(app, error);
     }
     if (!format.empty())
         return generate(app, format);
-    return chosen ? run(chosen) : refuse(app, "which command?");
+    return chosen ? run(chosen) : refuse(app, "no command is given");
 }
 
 } // namespace Zulm

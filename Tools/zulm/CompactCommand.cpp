@@ -5,8 +5,9 @@
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/MetaDataTail.h"
 #include "Tools/zulm/OutputFile.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 
@@ -57,17 +58,17 @@ Json streamDocument(const HeldStream& stream) {
     return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}, {"bytes", stream.present}};
 }
 
-void report(const TailOptions& options, const MetaDataTail& tail) {
+Json fileDocument(const TailOptions& options, const MetaDataTail& tail) {
     Json file = fileHeader(options.save.movie);
-    file.update(Json{{"output", validText(options.name())},
-                     {"bytes_before", tail.sizeBefore()},
+    addText(file, "output", options.name());
+    file.update(Json{{"bytes_before", tail.sizeBefore()},
                      {"bytes_after", tail.sizeAfter()},
                      {"streams_left_out", tail.streamsLeftOut()},
                      {"creators_left_out", tail.creatorsLeftOut()},
                      {"streams", Json::array()}});
     for (const HeldStream& stream : tail.streams())
         file["streams"].push_back(streamDocument(stream));
-    printReport(options.command(), Json::array({file}));
+    return file;
 }
 
 void print(const TailOptions& options, const MetaDataTail& tail) {
@@ -76,7 +77,7 @@ void print(const TailOptions& options, const MetaDataTail& tail) {
                             tail.sizeBefore(), tail.sizeAfter()));
 }
 
-ExitCode runTail(const TailOptions& options) {
+ExitCode writeTail(const TailOptions& options, RunReport& report) {
     const std::optional<DurableFile> lock = lockOf(options);
     const InputFile input(options.save.movie);
     Recording recording(input.path(), input.name());
@@ -89,14 +90,19 @@ ExitCode runTail(const TailOptions& options) {
     const std::unique_ptr<OutputFile> output = outputFor(options);
     tail.write(*output, options.name());
     output->commit();
-    if (options.json)
-        report(options, tail);
-    else
+    if (report.isWanted())
+        report.add(fileDocument(options, tail));
+    else if (!settings().quiet)
         print(options, tail);
     if (tail.bytesCut() == 0)
         return ExitFine;
     complain(fmt::format("{}: left out {} bytes of incomplete entries", options.name(), tail.bytesCut()));
     return ExitDamaged;
+}
+
+ExitCode runTail(const TailOptions& options) {
+    return withReport(options.command(), options.json, {options.save.movie},
+                      [&](RunReport& report) { return writeTail(options, report); });
 }
 
 CLI::App* addTailCommand(CLI::App& app, Action& chosen, KeptMetaData kept, const std::string& description) {

@@ -21,7 +21,7 @@ std::vector<std::string> namesOf(const std::vector<ManualOption>& options) {
 
 std::vector<ManualOption> withGlobalOptions(const Manual& manual, const ManualCommand& command) {
     std::vector<ManualOption> options = command.options;
-    for (const ManualOption& option : globalOptions(manual))
+    for (const ManualOption& option : globalOptions(manual, command))
         options.push_back(option);
     return options;
 }
@@ -50,15 +50,14 @@ std::string quoted(const std::string& text) {
     return "'" + escaped + "'";
 }
 
-/// What an option's value is completed with, as a line of bash.
+/// What an option's value is completed with, as a line of bash. Names of files are left to bash itself, which knows how
+/// they are quoted: without candidates it completes them.
 std::string bashValue(const ManualOption& option) {
     if (const auto choices = option.choices(); !choices.empty())
         return fmt::format("COMPREPLY=($(compgen -W '{}' -- \"$current\"))", fmt::join(choices, " "));
     if (isFolder(option))
-        return "COMPREPLY=($(compgen -d -- \"$current\")); compopt -o filenames 2>/dev/null";
-    if (isFile(option))
-        return "COMPREPLY=($(compgen -f -- \"$current\")); compopt -o filenames 2>/dev/null";
-    return "COMPREPLY=()";
+        return "compopt +o default -o dirnames 2>/dev/null";
+    return isFile(option) ? ":" : "compopt +o default 2>/dev/null";
 }
 
 /// The cases of options that take a value; `command` is a pattern for what stands in front of them.
@@ -141,6 +140,7 @@ std::string bashCompletion(const Manual& manual) {
     }
     std::string script = R"(# bash completion of zulm, made from its options
 _zulm() {
+    COMPREPLY=()
     local current=${COMP_WORDS[COMP_CWORD]} previous=${COMP_WORDS[COMP_CWORD-1]} command='' word options
     for word in "${COMP_WORDS[@]:1:COMP_CWORD-1}"; do
         case $word in
@@ -156,11 +156,9 @@ OPTIONS        *) options='GLOBAL' ;;
         COMPREPLY=($(compgen -W "$options" -- "$current"))
     elif [[ -z $command ]]; then
         COMPREPLY=($(compgen -W 'NAMES' -- "$current"))
-    else
-        COMPREPLY=($(compgen -f -- "$current")); compopt -o filenames 2>/dev/null
     fi
 }
-complete -F _zulm zulm
+complete -o default -F _zulm zulm
 )";
     const auto fill = [&script](const std::string& place, const std::string& text) {
         script.replace(script.find(place), place.size(), text);

@@ -2,6 +2,7 @@
 #include "Tools/demo/Movie.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/OutputFile.h"
+#include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "ZULMetaData/ZULMetaData.h"
 
@@ -9,6 +10,7 @@
 
 #include <filesystem>
 #include <memory>
+#include <string_view>
 
 namespace Zulm {
 
@@ -47,12 +49,16 @@ ExitCode runDemo(const DemoOptions& options) {
     }
     fs::create_directories(options.folder);
     const std::string movie = makeMovie(options);
-    const bool allSame = Demo::runDemo(fs::path(options.folder) / "streams", movie, writeOutput);
+    const auto print = [](std::string_view text) {
+        if (!settings().quiet)
+            writeOutput(text);
+    };
+    const bool allSame = Demo::runDemo(fs::path(options.folder) / "streams", movie, print);
     if (!allSame) {
         complain(fmt::format("{}: what was read back is not what was recorded", movie));
         return ExitDamaged;
     }
-    writeOutput("Everything that was recorded has been read back.\n");
+    print("Everything that was recorded has been read back.\n");
     return ExitFine;
 }
 

@@ -2,16 +2,20 @@
 #include "Tools/zulm/EntryFormat.h"
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
+#include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
 #include <algorithm>
+#include <cmath>
+#include <cstring>
 #include <limits>
 #include <memory>
 #include <optional>
+#include <utility>
 
 namespace Zulm {
 
@@ -25,8 +29,27 @@ struct DiffOptions {
     std::string right;
     std::vector<std::string> kinds;
     std::uint64_t limit = 100;
+    std::optional<double> tolerance; ///< in seconds
     bool json = false;
 };
+
+/// Whether two entries are the same but for their times. A time stands where both have their own at one place.
+bool areSameButForTime(const std::string& left, double leftTime, const std::string& right, double rightTime) {
+    const auto holds = [](const std::string& bytes, std::size_t position, double time) {
+        return std::memcmp(bytes.data() + position, &time, sizeof time) == 0;
+    };
+    if (left.size() != right.size())
+        return false;
+    for (std::size_t i = 0; i < left.size();) {
+        if (left.size() - i >= sizeof leftTime && holds(left, i, leftTime) && holds(right, i, rightTime))
+            i += sizeof leftTime;
+        else if (left[i] == right[i])
+            ++i;
+        else
+            return false;
+    }
+    return true;
+}
 
 /// An entry as a document; of a stream that cannot be decoded, its bytes.
 Json documentOf(const MetaDataHeader& header, const std::string& bytes) {
@@ -106,37 +129,68 @@ bool haveSameBytes(Recording& left, const HeldStream& leftStream, Recording& rig
     return true;
 }
 
+/// "NAME: differs", before what is printed first of a stream.
+class Heading {
+public:
+    explicit Heading(std::string name) : name_(std::move(name)) {}
+
+    void print() {
+        if (!std::exchange(isPrinted_, true))
+            writeOutput(fmt::format("{}: differs\n", name_));
+    }
+
+    bool isPrinted() const { return isPrinted_; }
+    const std::string& name() const { return name_; }
+
+private:
+    std::string name_;
+    bool isPrinted_ = false;
+};
+
 /// Compares two streams of one kind. Entries belong together by their times: of two that come next, the one with the
 /// smaller time is only on its side; with equal times, or none, they are one entry that may have changed.
 class StreamComparison {
 public:
-    StreamComparison(const DiffOptions& options, Side& left, Side& right, const std::string& name)
-        : options_(options), left_(left), right_(right), name_(name) {}
+    /// The differences become elements of the array that `writer` has open; they are printed if it is null.
+    StreamComparison(const DiffOptions& options, Side& left, Side& right, Heading& heading, JsonWriter* writer)
+        : options_(options), tolerance_(options.tolerance.value_or(0)), left_(left), right_(right), heading_(heading),
+          writer_(writer) {}
 
     void run() {
         while (left_.hasEntry() || right_.hasEntry()) {
-            if (left_.hasEntry() && right_.hasEntry() && left_.bytes() == right_.bytes())
+            if (areSame())
                 skipSame();
-            else if (!right_.hasEntry() || (left_.hasEntry() && left_.time() < right_.time()))
+            else if (!right_.hasEntry() || (left_.hasEntry() && left_.time() < right_.time() - tolerance_))
                 take("removed", removed_, true, false);
-            else if (!left_.hasEntry() || right_.time() < left_.time())
+            else if (!left_.hasEntry() || right_.time() < left_.time() - tolerance_)
                 take("added", added_, false, true);
             else
                 take("changed", changed_, true, true);
         }
-        printSummary();
+        if (!writer_ && (!foundNothing() || heading_.isPrinted()))
+            printSummary();
     }
 
-    Json document() const {
-        Json document{
-            {"status", "changed"}, {"same", same_}, {"changed", changed_}, {"added", added_}, {"removed", removed_}};
-        document["differences"] = differences_;
-        document["complete"] = differences() <= listed_;
-        return document;
+    bool foundNothing() const { return differences() == 0 && left_.rest() == 0 && right_.rest() == 0; }
+
+    Json counts() const {
+        return {{"same", same_},
+                {"changed", changed_},
+                {"added", added_},
+                {"removed", removed_},
+                {"complete", differences() <= listed_}};
     }
 
 private:
     std::uint64_t differences() const { return changed_ + added_ + removed_; }
+
+    bool areSame() const {
+        if (!left_.hasEntry() || !right_.hasEntry())
+            return false;
+        return left_.bytes() == right_.bytes() ||
+               (options_.tolerance && std::abs(left_.time() - right_.time()) <= tolerance_ &&
+                areSameButForTime(left_.bytes(), left_.time(), right_.bytes(), right_.time()));
+    }
 
     void skipSame() {
         ++same_;
@@ -156,10 +210,11 @@ private:
 
     void list(const char* change, const Json& left, const Json& right) {
         ++listed_;
-        if (options_.json) {
-            differences_.push_back({{"change", change}, {"a", left}, {"b", right}});
+        if (writer_)
+            return writer_->element({{"change", change}, {"a", left}, {"b", right}});
+        heading_.print();
+        if (settings().quiet)
             return;
-        }
         const bool isChange = !left.is_null() && !right.is_null();
         if (!left.is_null())
             printEntry(isChange ? '<' : '-', left);
@@ -175,21 +230,23 @@ private:
     }
 
     void printSummary() const {
-        if (options_.json)
+        heading_.print();
+        if (settings().quiet)
             return;
         if (differences() > listed_)
             writeOutput(fmt::format("  ... and {} more; '--limit 0' lists all\n", differences() - listed_));
-        writeOutput(fmt::format("  {}: {} changed, {} added, {} removed, {} the same\n", name_, changed_, added_,
-                                removed_, same_));
+        writeOutput(fmt::format("  {}: {} changed, {} added, {} removed, {} the same\n", heading_.name(), changed_,
+                                added_, removed_, same_));
         if (left_.rest() != right_.rest())
             writeOutput(fmt::format("  behind the last entry: {} and {} bytes\n", left_.rest(), right_.rest()));
     }
 
     const DiffOptions& options_;
+    double tolerance_;
     Side& left_;
     Side& right_;
-    std::string name_;
-    Json differences_ = Json::array();
+    Heading& heading_;
+    JsonWriter* writer_;
     std::uint64_t same_ = 0;
     std::uint64_t changed_ = 0;
     std::uint64_t added_ = 0;
@@ -199,8 +256,9 @@ private:
 
 class Comparison {
 public:
-    Comparison(const DiffOptions& options, Recording& left, Recording& right)
-        : options_(options), left_(left), right_(right) {}
+    /// The streams become elements of the array that `writer` has open; they are printed if it is null.
+    Comparison(const DiffOptions& options, Recording& left, Recording& right, JsonWriter* writer)
+        : options_(options), left_(left), right_(right), writer_(writer) {}
 
     /// The streams of both sides, merged in the order of their identifiers.
     void run(const std::vector<HeldStream>& left, const std::vector<HeldStream>& right) {
@@ -216,67 +274,92 @@ public:
         }
     }
 
-    const Json& streams() const { return streams_; }
     ExitCode code() const { return code_; }
 
 private:
-    void addStream(const HeldStream& stream, const Json& findings) {
-        Json document{{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}};
-        document.update(findings);
-        streams_.push_back(document);
+    static Json streamHeader(const HeldStream& stream) {
+        return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}};
+    }
+
+    static Json streamDocument(const HeldStream& stream, const char* status) {
+        Json document = streamHeader(stream);
+        document["status"] = status;
+        return document;
     }
 
     void addOneSided(const HeldStream& stream, const std::string& file, const char* status) {
         code_ = ExitDamaged;
-        addStream(stream, {{"status", status}});
-        if (!options_.json)
+        if (writer_)
+            writer_->element(streamDocument(stream, status));
+        else
             writeOutput(fmt::format("{}: only in {}\n", stream.name(), shown(file)));
     }
 
     void compare(const HeldStream& leftStream, const HeldStream& rightStream) {
-        if (haveSameBytes(left_, leftStream, right_, rightStream))
-            return addStream(leftStream, {{"status", "same"}});
-        code_ = ExitDamaged;
-        if (!options_.json)
-            writeOutput(fmt::format("{}: differs\n", leftStream.name()));
+        if (!haveSameBytes(left_, leftStream, right_, rightStream))
+            compareEntries(leftStream, rightStream);
+        else if (writer_)
+            writer_->element(streamDocument(leftStream, "same"));
+    }
+
+    void compareEntries(const HeldStream& leftStream, const HeldStream& rightStream) {
         Side left(left_, leftStream);
         Side right(right_, rightStream);
-        const Json headers = compareHeaders(left.header(), right.header());
-        StreamComparison entries(options_, left, right, leftStream.name());
+        Heading heading(leftStream.name());
+        if (!options_.tolerance && !writer_)
+            heading.print();
+        if (writer_) {
+            writer_->beginObject();
+            writer_->members(streamHeader(leftStream));
+        }
+        const bool haveSameHeader = compareHeaders(left.header(), right.header(), heading);
+        if (writer_)
+            writer_->beginArray("differences");
+        StreamComparison entries(options_, left, right, heading, writer_);
         entries.run();
-        Json findings = entries.document();
-        findings.update(headers);
-        addStream(leftStream, findings);
+        const bool areSame = options_.tolerance && haveSameHeader && entries.foundNothing();
+        if (!areSame)
+            code_ = ExitDamaged;
+        if (writer_) {
+            writer_->end();
+            writer_->member("status", areSame ? "same" : "changed");
+            writer_->members(entries.counts());
+            writer_->end();
+        }
         left.complainAboutRest();
         right.complainAboutRest();
     }
 
-    Json compareHeaders(const std::optional<MetaDataHeader>& left, const std::optional<MetaDataHeader>& right) const {
-        Json findings = Json::object();
+    bool compareHeaders(const std::optional<MetaDataHeader>& left, const std::optional<MetaDataHeader>& right,
+                        Heading& heading) const {
         if (!left || !right)
-            return findings;
-        compareNumbers(findings, "version", left->version, right->version);
-        compareNumbers(findings, "entry_size", left->fixedEntrySize, right->fixedEntrySize);
-        return findings;
+            return left.has_value() == right.has_value();
+        const bool hasSameVersion = compareNumbers("version", left->version, right->version, heading);
+        return compareNumbers("entry_size", left->fixedEntrySize, right->fixedEntrySize, heading) && hasSameVersion;
     }
 
     template <class Number>
-    void compareNumbers(Json& findings, const char* name, Number left, Number right) const {
+    bool compareNumbers(const char* name, Number left, Number right, Heading& heading) const {
         if (left == right)
-            return;
-        findings[name] = {{"a", left}, {"b", right}};
-        if (!options_.json)
-            writeOutput(fmt::format("  its header's {}: {} and {}\n", name, left, right));
+            return true;
+        if (writer_) {
+            writer_->member(name, {{"a", left}, {"b", right}});
+        } else {
+            heading.print();
+            if (!settings().quiet)
+                writeOutput(fmt::format("  its header's {}: {} and {}\n", name, left, right));
+        }
+        return false;
     }
 
     const DiffOptions& options_;
     Recording& left_;
     Recording& right_;
-    Json streams_ = Json::array();
+    JsonWriter* writer_;
     ExitCode code_ = ExitFine;
 };
 
-ExitCode runDiff(const DiffOptions& options) {
+ExitCode diff(const DiffOptions& options, RunReport& report) {
     const InputFile leftFile(options.left);
     const InputFile rightFile(options.right);
     Recording left(leftFile.path(), leftFile.name());
@@ -285,16 +368,25 @@ ExitCode runDiff(const DiffOptions& options) {
     const auto rightStreams = heldStreams(right, options.kinds);
     if (leftStreams.empty() && rightStreams.empty())
         return worseOf(complainAboutNothing(left, options.kinds), complainAboutNothing(right, options.kinds));
-    Comparison comparison(options, left, right);
+    JsonWriter* const writer = report.isWanted() ? &report.writer() : nullptr;
+    if (writer) {
+        writer->beginObject();
+        writer->members(fileHeader(left.name()));
+        writer->member("other", fileHeader(right.name()));
+        writer->beginArray("streams");
+    }
+    Comparison comparison(options, left, right, writer);
     comparison.run(leftStreams, rightStreams);
-    if (options.json) {
-        Json document = fileHeader(left.name());
-        document["other"] = fileHeader(right.name());
-        document["same"] = comparison.code() == ExitFine;
-        document["streams"] = comparison.streams();
-        printReport("diff", Json::array({document}));
+    if (writer) {
+        writer->end();
+        writer->member("same", comparison.code() == ExitFine);
     }
     return comparison.code();
+}
+
+ExitCode runDiff(const DiffOptions& options) {
+    return withReport("diff", options.json, {options.left, options.right},
+                      [&](RunReport& report) { return diff(options, report); });
 }
 
 } // namespace
@@ -309,6 +401,8 @@ void addDiffCommand(CLI::App& app, Action& chosen) {
     addStreamOption(*command, options->kinds, "Only this kind, such as cursorLocation, or UUID (repeatable)");
     addCount(*command, "--limit", options->limit,
              "List at most this many differences of each stream (100 unless it is given, 0 for all)");
+    addSeconds(*command, "--tolerance", options->tolerance,
+               "Entries with the same value are the same if their times differ by at most this");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm diff Original.mp4 Edited.mp4\n"
                     "zulm diff --stream keyboardAction --limit 0 Original.mp4 Edited.mp4");

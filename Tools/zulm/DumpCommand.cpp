@@ -1,13 +1,13 @@
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Command.h"
-#include "Tools/zulm/DumpDocument.h"
 #include "Tools/zulm/EntryFormat.h"
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
+#include "Tools/zulm/Printout.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Recording.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
@@ -27,66 +27,16 @@ using Json = nlohmann::ordered_json;
 namespace {
 
 struct DumpOptions {
-    std::string file;
+    std::vector<std::string> files;
     std::vector<std::string> kinds;
     EntryFormat format = EntryFormat::Text;
     std::optional<double> from;
     std::optional<double> to;
+    Columns columns;
     std::string imageFolder;
     bool force = false;
 
     bool covers(double time) const { return (!from || time >= *from) && (!to || time <= *to); }
-};
-
-/// Everything that one run prints, in its format.
-class Printout {
-public:
-    Printout(const DumpOptions& options, const Recording& recording) : options_(options) {
-        if (options_.format == EntryFormat::JSON)
-            document_.emplace(recording, writeOutput);
-    }
-
-    /// `keys` are those of its entries; none where these cannot be decoded.
-    void beginStream(const StreamInfo& stream, const EntryKeys* keys, bool isOnlyOne) {
-        kind_ = metaDataKindName(stream.type);
-        keys_ = keys;
-        if (options_.format == EntryFormat::Text && !isOnlyOne)
-            writeOutput(heading(kind_) + '\n');
-        if (options_.format == EntryFormat::CSV && keys)
-            writeOutput(fmt::format("{}stream,{}\n", hasTable_ ? "\n" : "", csvHeader(*keys)));
-        hasTable_ |= keys != nullptr;
-        if (options_.format == EntryFormat::JSON)
-            document_->beginStream(stream, keys != nullptr);
-    }
-
-    void print(const Json& entry) {
-        switch (options_.format) {
-        case EntryFormat::Text: return writeOutput(textLine(entry) + '\n');
-        case EntryFormat::CSV: return writeOutput(kind_ + ',' + csvLine(entry, *keys_) + '\n');
-        case EntryFormat::JSON: return document_->add(entry);
-        case EntryFormat::NDJSON: break;
-        }
-        Json line{{"stream", kind_}};
-        line.update(entry);
-        writeOutput(jsonLine(line) + '\n');
-    }
-
-    void endStream() {
-        if (options_.format == EntryFormat::JSON)
-            document_->endStream();
-    }
-
-    void end() {
-        if (options_.format == EntryFormat::JSON)
-            document_->end();
-    }
-
-private:
-    const DumpOptions& options_;
-    std::string kind_;
-    const EntryKeys* keys_ = nullptr;
-    bool hasTable_ = false;
-    std::optional<DumpDocument> document_;
 };
 
 /// Prints the entries of one stream as they are read.
@@ -161,11 +111,18 @@ ExitCode dumpEntries(Recording& recording, const DumpOptions& options, Printout&
 ExitCode dumpStream(Recording& recording, const DumpOptions& options, Printout& printout, const StreamInfo& stream,
                     bool isOnlyOne) {
     ExitCode code = ExitFine;
-    const bool isDecoded = stream.isDecodable && RecordedKinds::visit(stream.type, [&]<class Kind>() {
-                               const EntryKeys keys = tableKeys<Kind>();
-                               printout.beginStream(stream, &keys, isOnlyOne);
-                               code = dumpEntries<Kind>(recording, options, printout, stream);
-                           });
+    bool isShown = true;
+    const bool isDecoded =
+        stream.isDecodable && RecordedKinds::visit(stream.type, [&]<class Kind>() {
+            const EntryKeys keys = tableKeys<Kind>();
+            isShown = options.columns.areIn(keys);
+            if (!isShown)
+                return say(fmt::format("{}: {} has none of the columns", recording.name(), stream.kind));
+            printout.beginStream(stream, &keys, isOnlyOne);
+            code = dumpEntries<Kind>(recording, options, printout, stream);
+        });
+    if (!isShown)
+        return code;
     if (!isDecoded) {
         printout.beginStream(stream, nullptr, isOnlyOne);
         warn(fmt::format("{}: entries of {}, version {}, cannot be decoded", recording.name(),
@@ -194,29 +151,39 @@ Choice chosenTypes(const std::vector<uuid>& available, const DumpOptions& option
     return choice;
 }
 
-ExitCode runDump(const DumpOptions& options) {
-    const InputFile input(options.file);
+ExitCode dumpFile(const std::string& path, const DumpOptions& options, Printout& printout) {
+    const InputFile input(path);
     Recording recording(input.path(), input.name());
     const std::vector<uuid> available = recording.parser().getAvailableMetaDataUUIDs();
     const auto [types, missing] = available.empty() ? Choice() : chosenTypes(available, options);
-    if (!options.imageFolder.empty())
-        std::filesystem::create_directories(options.imageFolder);
-    Printout printout(options, recording);
+    printout.beginFile(recording);
     ExitCode worst = ExitFine;
     for (const uuid& type : types)
         worst = worseOf(worst, dumpStream(recording, options, printout, recording.streamInfo(type), types.size() == 1));
-    printout.end();
+    printout.endFile();
     if (available.empty() || !missing.empty())
         worst = worseOf(worst, complainAboutNothing(recording, missing));
     return worst;
+}
+
+ExitCode runDump(const DumpOptions& options) {
+    const bool isDocument = options.format == EntryFormat::JSON;
+    const auto dump = [&](RunReport& report) {
+        if (!options.imageFolder.empty())
+            createFolder(options.imageFolder);
+        Printout printout(options.format, options.columns, options.files.size() > 1,
+                          isDocument ? &report.writer() : nullptr);
+        return forEachFile(options.files, [&](const std::string& path) { return dumpFile(path, options, printout); });
+    };
+    return withReport("dump", isDocument, options.files, dump, JsonWriter::Style::Lines);
 }
 
 } // namespace
 
 void addDumpCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<DumpOptions>();
-    CLI::App* command = app.add_subcommand("dump", "Print the entries of a file's streams");
-    command->add_option("FILE", options->file, "A movie, RIFF file or stream file; - is standard input")->required();
+    CLI::App* command = app.add_subcommand("dump", "Print the entries of the streams of one or several files");
+    command->add_option("FILE", options->files, "Movies, RIFF files or stream files; - is standard input")->required();
     addStreamOption(*command, options->kinds, "Only this kind, such as cursorLocation, or UUID (repeatable)");
     addChoice(*command, "--format", options->format,
               "How entries are printed. csv has one table for every stream, an empty line between them",
@@ -224,6 +191,12 @@ void addDumpCommand(CLI::App& app, Action& chosen) {
                {"json", EntryFormat::JSON},
                {"ndjson", EntryFormat::NDJSON},
                {"csv", EntryFormat::CSV}});
+    command
+        ->add_option_function<std::string>(
+            "--columns", [options](const std::string& list) { options->columns = Columns(list); },
+            "Print only these members of the entries, such as timestamp,x,y, and only the streams that have some of "
+            "them. With csv, ndjson and text, stream and file may be among them")
+        ->type_name("NAMES");
     addSeconds(*command, "--from", options->from, "Only entries at this time or later", Sign::Any);
     addSeconds(*command, "--to", options->to, "Only entries at this time or earlier", Sign::Any);
     command->add_option("--images", options->imageFolder, "Write cursor images into this folder, as they are stored")
@@ -234,6 +207,8 @@ void addDumpCommand(CLI::App& app, Action& chosen) {
     command->callback([options, &chosen] {
         if (options->from && options->to && *options->from > *options->to)
             throw CLI::ValidationError("--from", fmt::format("{} is later than --to {}", *options->from, *options->to));
+        if (!options->imageFolder.empty() && options->files.size() > 1)
+            throw CLI::ValidationError("--images", "the images of one FILE can be written at once, not of several");
         chosen = [options] { return runDump(*options); };
     });
 }

@@ -6,7 +6,6 @@
 namespace Zulm {
 
 using namespace ZULMetaData;
-using Json = nlohmann::ordered_json;
 
 namespace {
 
@@ -26,68 +25,53 @@ private:
 
 } // namespace
 
-void OpenArray::begin(const Json& document) {
-    const std::string text = jsonLine(document);
-    sink_(std::string_view(text).substr(0, text.size() - 2));
-    isEmpty_ = true;
-}
-
-void OpenArray::add(const Json& element) {
-    separate();
-    sink_(jsonLine(element));
-}
-
-void OpenArray::separate() {
-    sink_(isEmpty_ ? "\n" : ",\n");
-    isEmpty_ = false;
-}
-
-DumpDocument::DumpDocument(const Recording& recording, const TextSink& sink)
-    : sink_(sink), files_(sink), streams_(sink), entries_(sink) {
-    Json report = reportHeader("dump");
-    report["files"] = Json::array();
-    files_.begin(report);
-    files_.separate();
-    Json file = fileHeader(recording.name());
-    file["container"] = recording.container();
-    file["streams"] = Json::array();
-    streams_.begin(file);
+void DumpDocument::beginFile(const Recording& recording) {
+    writer_.beginObject();
+    writer_.members(fileHeader(recording.name()));
+    writer_.member("container", recording.container());
+    writer_.beginArray("streams");
 }
 
 void DumpDocument::beginStream(const StreamInfo& stream, bool isDecoded) {
     isDecoded_ = isDecoded;
-    Json document{{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}, {"version", stream.version}};
-    document["entries"] = isDecoded ? Json::array() : Json(nullptr);
-    if (!isDecoded)
-        return streams_.add(document);
-    streams_.separate();
-    entries_.begin(document);
+    writer_.beginObject();
+    writer_.members(
+        {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}, {"version", stream.version}});
+    if (isDecoded)
+        writer_.beginArray("entries");
+    else
+        writer_.member("entries", nullptr);
 }
 
 void DumpDocument::endStream() {
     if (isDecoded_)
-        entries_.end();
+        writer_.end();
+    writer_.end();
 }
 
-void DumpDocument::end() {
-    streams_.end();
-    files_.end();
-    sink_("\n");
+void DumpDocument::endFile() {
+    writer_.end();
+    writer_.end();
 }
 
 void writeDump(Recording& recording, const std::vector<uuid>& types, const TextSink& sink) {
-    DumpDocument document(recording, sink);
+    JsonWriter writer(sink, JsonWriter::Style::Lines);
+    beginReport(writer, "dump");
+    DumpDocument document(writer);
+    document.beginFile(recording);
     for (const uuid& type : types) {
         const StreamInfo stream = recording.streamInfo(type);
         document.beginStream(stream, stream.isDecodable);
         if (stream.isDecodable)
             RecordedKinds::visit(type, [&]<class Kind>() {
-                EntryWriter<Kind> writer(document);
-                recording.readEntries<typename Kind::Value>(stream, writer);
+                EntryWriter<Kind> entries(document);
+                recording.readEntries<typename Kind::Value>(stream, entries);
             });
         document.endStream();
     }
-    document.end();
+    document.endFile();
+    endReport(writer, {});
+    sink("\n");
 }
 
 } // namespace Zulm

@@ -80,6 +80,10 @@ std::string csvField(const std::string& text) {
     return fmt::format("\"{}\"", doubled);
 }
 
+std::string timeText(const Json& time) {
+    return time.is_number() ? fmt::format("{:>12.6f}", time.get<double>()) : fmt::format("{:>12}", plain(time));
+}
+
 bool isShownInText(std::string_view key) {
     return key != s_time && key != s_shortTime && !key.ends_with(s_storedSuffix);
 }
@@ -163,9 +167,7 @@ std::string damageOf(const Json& entry) {
 }
 
 std::string textLine(const Json& entry) {
-    const Json& time = entry[s_time];
-    std::string line =
-        time.is_number() ? fmt::format("{:>12.6f}", time.get<double>()) : fmt::format("{:>12}", plain(time));
+    std::string line = entry.contains(s_time) ? timeText(entry[s_time]) : std::string();
     for (const auto& [key, value] : entry.items())
         if (isShownInText(key))
             line += fmt::format("  {}={}", key, value.is_string() ? quoted(bytesOf(entry, key)) : plain(value));

@@ -1,7 +1,8 @@
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
+#include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 
@@ -33,6 +34,12 @@ ExitCode complainAboutCut(const std::string& file, const HeldStream& stream) {
     return ExitDamaged;
 }
 
+void beginFile(JsonWriter& writer, const std::string& name) {
+    writer.beginObject();
+    writer.members(fileHeader(name));
+    writer.beginArray("streams");
+}
+
 Json streamDocument(const HeldStream& stream, const std::string& output) {
     Json document{{"kind", kindDocument(stream.type)},
                   {"uuid", uuidText(stream.type)},
@@ -51,7 +58,7 @@ std::vector<std::string> outputsFor(const std::vector<HeldStream>& streams, cons
     return outputs;
 }
 
-ExitCode runExtract(const ExtractOptions& options) {
+ExitCode extract(const ExtractOptions& options, RunReport& report) {
     const InputFile input(options.file);
     Recording recording(input.path(), input.name());
     const std::vector<HeldStream> streams = heldStreams(recording, options.kinds);
@@ -60,19 +67,23 @@ ExitCode runExtract(const ExtractOptions& options) {
     createFolder(options.folder);
     const std::vector<std::string> outputs = outputsFor(streams, options.folder);
     requireFree(outputs, options.force);
-    Json document = fileHeader(input.name());
-    document["streams"] = Json::array();
+    if (report.isWanted())
+        beginFile(report.writer(), input.name());
     ExitCode worst = ExitFine;
     for (std::size_t i = 0; i < streams.size(); ++i) {
         writePart(input, streams[i].offset, streams[i].present, outputs[i], options.force);
         worst = worseOf(worst, complainAboutCut(input.name(), streams[i]));
-        document["streams"].push_back(streamDocument(streams[i], outputs[i]));
-        if (!options.json)
+        if (report.isWanted())
+            report.writer().element(streamDocument(streams[i], outputs[i]));
+        else if (!settings().quiet)
             writeOutput(fmt::format("{}: {} bytes\n", shown(outputs[i]), streams[i].present));
     }
-    if (options.json)
-        printReport("extract", Json::array({document}));
     return worst;
+}
+
+ExitCode runExtract(const ExtractOptions& options) {
+    return withReport("extract", options.json, {options.file},
+                      [&](RunReport& report) { return extract(options, report); });
 }
 
 } // namespace

@@ -1,6 +1,6 @@
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 #include "Tools/zulm/TextPattern.h"
@@ -33,14 +33,14 @@ constexpr bool holdsTexts = OneOf<typename Kind::Value, std::string, std::list<s
 /// A search through the texts of one file.
 class Search {
 public:
-    Search(const GrepOptions& options, const TextPattern& pattern, const std::string& file)
-        : options_(options), pattern_(pattern), input_(file), recording_(input_.path(), input_.name()) {
-        document_ = fileHeader(input_.name());
-        document_["matches"] = Json::array();
-    }
+    Search(const GrepOptions& options, const TextPattern& pattern, const std::string& file, RunReport& report)
+        : options_(options), pattern_(pattern), input_(file), recording_(input_.path(), input_.name()),
+          report_(report) {}
 
     /// 0 where something matched, 4 where nothing did, 3 where not everything could be searched.
     ExitCode run() {
+        if (report_.isWanted())
+            beginFile(report_.writer());
         for (const HeldStream& stream : heldStreams(recording_, options_.kinds))
             RecordedKinds::visit(stream.type, [&]<class Kind>() {
                 if constexpr (holdsTexts<Kind>)
@@ -51,9 +51,13 @@ public:
         return matches_ > 0 ? ExitFine : ExitNoMetaData;
     }
 
-    const Json& document() const { return document_; }
-
 private:
+    void beginFile(JsonWriter& writer) const {
+        writer.beginObject();
+        writer.members(fileHeader(input_.name()));
+        writer.beginArray("matches");
+    }
+
     template <class Value>
     void search(const HeldStream& stream) {
         StreamEntries entries = entriesOf(recording_, stream);
@@ -91,19 +95,19 @@ private:
 
     void report(const HeldStream& stream, double time, const std::string& text) {
         ++matches_;
-        if (!options_.json)
+        if (!report_.isWanted())
             return writeOutput(
                 fmt::format("{}:{}:{:.6f}: {}\n", shown(input_.name()), stream.name(), time, shown(text)));
         Json match{{"stream", stream.name()}, {"timestamp", numberDocument(time)}};
         addText(match, "text", text);
-        document_["matches"].push_back(std::move(match));
+        report_.writer().element(match);
     }
 
     const GrepOptions& options_;
     const TextPattern& pattern_;
     InputFile input_;
     Recording recording_;
-    Json document_;
+    RunReport& report_;
     std::uint64_t matches_ = 0;
     bool isDamaged_ = false;
 };
@@ -115,20 +119,21 @@ ExitCode combined(ExitCode left, ExitCode right) {
     return worseOf(left, right);
 }
 
-ExitCode runGrep(const GrepOptions& options) {
+ExitCode grep(const GrepOptions& options, RunReport& report) {
     const TextPattern pattern(options.pattern, options.ignoreCase, options.isFixed);
-    Json files = Json::array();
     ExitCode code = ExitNoMetaData;
     for (const std::string& file : options.files)
         code = combined(code, forEachFile({file}, [&](const std::string& name) {
-                            Search search(options, pattern, name);
-                            const ExitCode found = search.run();
-                            files.push_back(search.document());
-                            return found;
+                            return Search(options, pattern, name, report).run();
                         }));
-    if (options.json)
-        printReport("grep", std::move(files));
+    if (code == ExitNoMetaData)
+        for (const std::string& file : options.files)
+            report.note(file, "no text in it matches the pattern");
     return code;
+}
+
+ExitCode runGrep(const GrepOptions& options) {
+    return withReport("grep", options.json, options.files, [&](RunReport& report) { return grep(options, report); });
 }
 
 } // namespace

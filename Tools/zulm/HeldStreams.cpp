@@ -36,7 +36,7 @@ std::string checkKind(const std::string& kind) {
         names.emplace_back(registered.name);
     if (isIdentifier(kind) || std::find(names.begin(), names.end(), kind) != names.end())
         return {};
-    return fmt::format("no kind of stream is called {}{} (the kinds are {})", kind, suggestionFor(kind, names),
+    return fmt::format("no kind of stream is called '{}'{} (the kinds are {})", kind, suggestionFor(kind, names),
                        fmt::join(names, ", "));
 }
 

@@ -105,7 +105,8 @@ std::string commandPage(const CLI::App& app) {
     return wrapped(command.description, 0) + "\n\nUsage: " + command.usage() + '\n' +
            section("Arguments", table(rowsOf(command.options, true))) +
            section("Options", table(rowsOf(command.options, false))) +
-           section("Options of every command", table(rowsOf(globalOptions(manualOf(*app.get_parent())), false))) +
+           section("Options of every command",
+                   table(rowsOf(globalOptions(manualOf(*app.get_parent()), command), false))) +
            section(command.examples.size() == 1 ? "Example" : "Examples", examplesOf(command.examples));
 }
 

@@ -4,7 +4,7 @@
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Recording.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 
@@ -17,7 +17,6 @@
 namespace Zulm {
 
 using namespace ZULMetaData;
-using Json = nlohmann::ordered_json;
 
 namespace {
 
@@ -54,10 +53,10 @@ std::string creatorLine(const CreatorAttributes& creator) {
                        isPlatform ? " (the name is the platform's: no stamp stores the creator's)" : "");
 }
 
-void print(const FileInfo& file) {
+void print(Recording& recording, const FileInfo& file) {
     const std::string duration = file.duration ? fmt::format("{:.3f} s", *file.duration) : "duration not told";
     writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", shown(file.name), file.container, duration,
-                            bytesText(file.layout.fileSize), file.streams.size(), file.streams.size() == 1 ? "" : "s"));
+                            bytesText(file.bytes), file.streams.size(), file.streams.size() == 1 ? "" : "s"));
     if (!file.streams.empty())
         writeOutput(heading(fmt::format("  {:<23}  {:>9}  {:>10}  {:>10}  {:>8}  {:>10}  {:>7}  {}", "kind", "entries",
                                         "first s", "last s", "per s", "bytes", "version", "uuid")) +
@@ -66,10 +65,10 @@ void print(const FileInfo& file) {
         printRow(stream);
     for (const ZCAPHeader& info : file.creators)
         writeOutput(creatorLine(info.creator));
-    for (const LayoutItem& child : metaDataChildren(file.layout))
-        if (child.isForeign)
-            writeOutput(fmt::format("  foreign atom: '{}' at offset {}, {} bytes\n", printable(child.item.type),
-                                    child.item.offset, child.size));
+    visitForeignAtoms(recording, [](const LayoutItem& atom) {
+        writeOutput(fmt::format("  foreign atom: '{}' at offset {}, {} bytes\n", printable(atom.item.type),
+                                atom.item.offset, atom.size));
+    });
 }
 
 /// Only so many: the rest is for the command that is made for it.
@@ -84,22 +83,25 @@ void warnOf(const FileInfo& file) {
                          damage.size() > most ? fmt::format("{} more", damage.size() - most) : "what that means"));
 }
 
-ExitCode runInfo(const InfoOptions& options) {
-    Json files = Json::array();
-    const ExitCode code = forEachFile(options.files, [&](const std::string& path) {
-        const InputFile input(path);
-        Recording recording(input.path(), input.name());
-        const FileInfo file = inspect(recording);
-        warnOf(file);
-        if (options.json)
-            files.push_back(infoDocument(file));
-        else
-            print(file);
-        return exitCodeFor(file);
-    });
-    if (options.json)
-        printReport("info", std::move(files));
+ExitCode showInfo(const std::string& path, RunReport& report) {
+    const InputFile input(path);
+    Recording recording(input.path(), input.name());
+    const FileInfo file = inspect(recording);
+    warnOf(file);
+    if (report.isWanted())
+        writeInfo(report.writer(), recording, file);
+    else
+        print(recording, file);
+    const ExitCode code = exitCodeFor(file);
+    if (code == ExitNoMetaData)
+        report.note(path, "has no recording metadata");
     return code;
+}
+
+ExitCode runInfo(const InfoOptions& options) {
+    return withReport("info", options.json, options.files, [&](RunReport& report) {
+        return forEachFile(options.files, [&](const std::string& path) { return showInfo(path, report); });
+    });
 }
 
 } // namespace

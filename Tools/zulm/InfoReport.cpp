@@ -46,6 +46,14 @@ std::string shownCreator(const CreatorAttributes& creator) {
     return fmt::format("{} {} on version {}", shown(name), shown(version), shown(platformVersion));
 }
 
+namespace {
+
+Json foreignDocument(const LayoutItem& atom) {
+    return {{"type", printable(atom.item.type)}, {"offset", atom.item.offset}, {"size", atom.size}};
+}
+
+} // namespace
+
 std::optional<double> entriesPerSecond(const StreamInfo& stream) {
     if (!stream.firstTime || !stream.lastTime || stream.entries < 2)
         return std::nullopt;
@@ -53,11 +61,11 @@ std::optional<double> entriesPerSecond(const StreamInfo& stream) {
     return std::isfinite(rate) && rate > 0 ? std::optional(rate) : std::nullopt;
 }
 
-std::vector<LayoutItem> metaDataChildren(const Layout& layout) {
-    std::vector<LayoutItem> children;
-    for (const LayoutItem& item : layout.items)
-        children.insert(children.end(), item.children.begin(), item.children.end());
-    return children;
+void visitForeignAtoms(Recording& recording, const std::function<void(const LayoutItem& atom)>& visit) {
+    walkLayout(recording, LayoutPart::MetaData, {[&](const LayoutItem& item, bool) {
+                   if (item.isForeign)
+                       visit(item);
+               }});
 }
 
 FileInfo inspect(Recording& recording) {
@@ -66,36 +74,39 @@ FileInfo inspect(Recording& recording) {
         requireRead(recording.parser().getStream(), recording.name());
         return value;
     };
-    return {recording.name(),
-            recording.container(),
-            read(movieDuration(recording.parser())),
-            recording.streams(),
-            read(readRecordingInfo(recording.parser())),
-            read(layoutOf(recording, LayoutPart::MetaData)),
-            validation.allFindings(),
-            validation.isDamaged()};
+    return {recording.name(),         recording.container(),
+            recording.size(),         read(movieDuration(recording.parser())),
+            recording.streams(),      read(readRecordingInfo(recording.parser())),
+            validation.allFindings(), validation.isDamaged()};
 }
 
-Json infoDocument(const FileInfo& file) {
-    Json document = fileHeader(file.name);
-    document.update(Json{{"container", file.container},
-                         {"bytes", file.layout.fileSize},
-                         {"duration", numberDocument(file.duration)},
-                         {"streams", Json::array()},
-                         {"creators", Json::array()},
-                         {"foreign_atoms", Json::array()},
-                         {"warnings", Json::array()}});
+void writeInfo(JsonWriter& writer, Recording& recording, const FileInfo& file) {
+    writer.beginObject();
+    writer.members(fileHeader(file.name));
+    writer.members({{"container", file.container}, {"bytes", file.bytes}, {"duration", numberDocument(file.duration)}});
+    writer.beginArray("streams");
     for (const StreamInfo& stream : file.streams)
-        document["streams"].push_back(streamDocument(stream));
+        writer.element(streamDocument(stream));
+    writer.end();
+    writer.beginArray("creators");
     for (const ZCAPHeader& info : file.creators)
-        document["creators"].push_back(creatorDocument(info.creator));
-    for (const LayoutItem& child : metaDataChildren(file.layout))
-        if (child.isForeign)
-            document["foreign_atoms"].push_back(
-                {{"type", printable(child.item.type)}, {"offset", child.item.offset}, {"size", child.size}});
+        writer.element(creatorDocument(info.creator));
+    writer.end();
+    writer.beginArray("foreign_atoms");
+    visitForeignAtoms(recording, [&](const LayoutItem& atom) { writer.element(foreignDocument(atom)); });
+    writer.end();
+    writer.beginArray("warnings");
     for (const Finding& finding : file.warnings)
-        document["warnings"].push_back(findingDocument(finding));
-    return document;
+        writer.element(findingDocument(finding));
+    writer.end();
+    writer.end();
+}
+
+Json infoDocument(Recording& recording) {
+    std::string text;
+    JsonWriter writer([&text](std::string_view piece) { text += piece; }, JsonWriter::Style::Lines);
+    writeInfo(writer, recording, inspect(recording));
+    return Json::parse(text);
 }
 
 } // namespace Zulm

@@ -2,11 +2,14 @@
 
 // What `zulm info` tells of a file.
 
+#include "Tools/zulm/JsonWriter.h"
 #include "Tools/zulm/Layout.h"
 #include "Tools/zulm/Recording.h"
 
 #include <nlohmann/json.hpp>
 
+#include <cstdint>
+#include <functional>
 #include <optional>
 #include <string>
 #include <vector>
@@ -16,28 +19,31 @@ namespace Zulm {
 struct FileInfo {
     std::string name;
     std::string container;
+    std::uint64_t bytes = 0;
     std::optional<double> duration;
     std::vector<StreamInfo> streams;
     std::vector<ZULMetaData::ZCAPHeader> creators;
-    Layout layout;
     std::vector<ZULMetaData::Finding> warnings;
     bool isDamaged = false;
 };
 
-/// Throws `Failure` where the file cannot be read.
+/// Throws `Failure` if the file cannot be read.
 FileInfo inspect(Recording& recording);
 
-/// Between the first and the last entry; none where they are at one time or at none.
+/// The rate between the first and the last entry; empty if they are at one time or have none.
 std::optional<double> entriesPerSecond(const StreamInfo& stream);
 
-/// What is inside of the file's metadata.
-std::vector<LayoutItem> metaDataChildren(const Layout& layout);
+/// Visits what lies inside of the file's metadata and is no stream.
+void visitForeignAtoms(Recording& recording, const std::function<void(const LayoutItem& atom)>& visit);
 
 /// The texts of a creator with everything that is stored in their fields.
 nlohmann::ordered_json creatorDocument(const ZULMetaData::CreatorAttributes& creator);
 std::string shownCreator(const ZULMetaData::CreatorAttributes& creator); ///< "Mac 1.2 on version 6.1.0"
 
-/// The file's object of `zulm info --json`.
-nlohmann::ordered_json infoDocument(const FileInfo& file);
+/// Writes the file's object of `zulm info --json`.
+void writeInfo(JsonWriter& writer, Recording& recording, const FileInfo& file);
+
+/// The same object as a whole.
+nlohmann::ordered_json infoDocument(Recording& recording);
 
 } // namespace Zulm

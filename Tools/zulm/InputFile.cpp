@@ -15,6 +15,7 @@
 #include <limits>
 #include <string_view>
 #include <sys/stat.h>
+#include <system_error>
 #include <unistd.h>
 
 namespace Zulm {
@@ -45,8 +46,9 @@ void writeAll(int file, const char* bytes, std::size_t size) {
         if (put < 0 && errno == EINTR)
             continue;
         if (put < 0)
-            throw Failure(fmt::format("{}: cannot be kept in a temporary file: {}; TMPDIR names another folder",
-                                      s_standardInput, std::strerror(errno)));
+            throw Failure(
+                fmt::format("{}: standard input cannot be kept in a temporary file: {}; set TMPDIR to another folder",
+                            s_standardInput, std::strerror(errno)));
         bytes += put;
         size -= static_cast<std::size_t>(put);
     }
@@ -58,6 +60,22 @@ bool isPipeOfStandardInput(const std::string& path) {
     struct stat input {};
     return stat(path.c_str(), &named) == 0 && S_ISFIFO(named.st_mode) && fstat(STDIN_FILENO, &input) == 0 &&
            named.st_dev == input.st_dev && named.st_ino == input.st_ino;
+}
+
+/// Throws `Failure` if TMPDIR names no folder that can be written to.
+std::unique_ptr<TemporaryFile> newSpoolFile(const std::string& extension) {
+    std::error_code error;
+    const std::string folder = std::filesystem::temp_directory_path(error).string();
+    if (error)
+        throw Failure(fmt::format("{}: standard input cannot be kept in a temporary file, because TMPDIR names no "
+                                  "folder; set it to one, or unset it",
+                                  s_standardInput));
+    try {
+        return std::make_unique<TemporaryFile>(folder, "zulm", extension);
+    } catch (const std::system_error& failed) {
+        throw Failure(fmt::format("{}: standard input cannot be kept in {}: {}; set TMPDIR to another folder",
+                                  s_standardInput, folder, failed.code().message()));
+    }
 }
 
 } // namespace
@@ -82,8 +100,7 @@ void InputFile::spool() {
     const std::string_view extension = ZULMetaData::extensionFor(recognized.type);
     if (extension.empty())
         throw Failure(fmt::format("{}: standard input {}", name_, recognized.refusal()));
-    const std::string folder = std::filesystem::temp_directory_path().string();
-    temporary_ = std::make_unique<TemporaryFile>(folder, "zulm", std::string(extension));
+    temporary_ = newSpoolFile(std::string(extension));
     path_ = temporary_->path();
     const ZULMetaData::Descriptor file(open(path_.c_str(), O_WRONLY | O_CLOEXEC));
     for (; size > 0; size = readInput(piece.data(), piece.size()))

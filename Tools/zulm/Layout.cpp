@@ -6,7 +6,7 @@
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <utility>
+#include <istream>
 
 namespace Zulm {
 
@@ -14,46 +14,69 @@ using namespace ZULMetaData;
 
 namespace {
 
-/// One list of items and the bytes that they should fill.
-class Walk {
+/// Leaves the stream where it was.
+class PositionKept {
 public:
-    Walk(Recording& recording, LayoutPart part, Layout& layout)
-        : name_(recording.name()), parser_(recording.parser()), part_(part), layout_(layout) {}
-
-    std::vector<LayoutItem> items(std::uint64_t begin, std::uint64_t end, bool isInsideMetaData) {
-        const std::uint64_t firstEnd = layout_.ends.size();
-        std::vector<LayoutItem> items;
-        std::uint64_t position = begin;
-        visit(begin, end, [&](const ContainerItem& found) {
-            LayoutItem item = entryFor(found, isInsideMetaData);
-            const std::string reason = reasonToEnd(item, end, isInsideMetaData);
-            if (reason.empty())
-                position = behind(item);
-            else
-                layout_.ends.push_back({found.offset, reason});
-            if (isInsideMetaData || item.isMetaData || part_ == LayoutPart::Whole)
-                items.push_back(std::move(item));
-            return reason.empty();
-        });
-        const bool isFilled = position >= end || layout_.ends.size() > firstEnd;
-        if (!isFilled)
-            layout_.ends.push_back(
-                {position, fmt::format("{} bytes are left, too few for another header", end - position)});
-        for (LayoutItem& item : items) {
-            if (item.isMetaData)
-                item.children = this->items(item.item.payloadOffset(), std::min(item.item.end(), end), true);
-            else if (isInsideMetaData && !item.isForeign)
-                item.stream = streamAt(item.item.payloadOffset());
-        }
-        return items;
+    explicit PositionKept(std::istream& stream) : stream_(stream) {
+        stream_.clear();
+        position_ = stream_.tellg();
     }
+    ~PositionKept() {
+        stream_.clear();
+        stream_.seekg(position_);
+    }
+    PositionKept(const PositionKept&) = delete;
+    PositionKept& operator=(const PositionKept&) = delete;
 
 private:
+    std::istream& stream_;
+    std::istream::pos_type position_;
+};
+
+class Walk {
+public:
+    Walk(Recording& recording, LayoutPart part, const LayoutVisitor& visitor)
+        : name_(recording.name()), parser_(recording.parser()), fileSize_(recording.size()), part_(part),
+          visitor_(visitor) {}
+
+    void run() { walk(0, fileSize_, false); }
+
+private:
+    /// One list of items and the bytes that they should fill.
+    void walk(std::uint64_t begin, std::uint64_t end, bool isInsideMetaData) {
+        std::uint64_t position = begin;
+        bool hasEnded = false;
+        visit(begin, end, [&](const ContainerItem& found) {
+            const LayoutItem item = entryFor(found, isInsideMetaData);
+            show(item, end, isInsideMetaData);
+            const std::string reason = reasonToEnd(item, end, isInsideMetaData);
+            hasEnded = !reason.empty();
+            if (hasEnded)
+                visitor_.end({found.offset, reason});
+            else
+                position = behind(item);
+            return !hasEnded;
+        });
+        if (position < end && !hasEnded)
+            visitor_.end({position, fmt::format("{} bytes are left, too few for another header", end - position)});
+    }
+
+    void show(const LayoutItem& item, std::uint64_t end, bool isInsideMetaData) {
+        if (!isInsideMetaData && !item.isMetaData && part_ != LayoutPart::Whole)
+            return;
+        visitor_.item(item, isInsideMetaData);
+        if (!item.isMetaData)
+            return;
+        const PositionKept kept(parser_.getStream());
+        walk(item.item.payloadOffset(), std::min(item.item.end(), end), true);
+        visitor_.childrenEnd();
+    }
+
     bool isMovie() const { return parser_.getStreamType() == MetaDataParser::QuickTime; }
     const char* what() const { return isMovie() ? "atom" : "chunk"; }
 
     void visit(std::uint64_t begin, std::uint64_t end, const ContainerVisitor& visitor) {
-        (isMovie() ? visitAtoms : visitChunks)(parser_.getStream(), begin, end, layout_.fileSize, visitor);
+        (isMovie() ? visitAtoms : visitChunks)(parser_.getStream(), begin, end, fileSize_, visitor);
         requireRead(parser_.getStream(), name_);
     }
 
@@ -61,16 +84,18 @@ private:
         LayoutItem entry;
         entry.item = found;
         entry.isOpenEnded = isMovie() && found.sizeField == 0;
-        entry.size = entry.isOpenEnded ? layout_.fileSize - found.offset : found.size;
+        entry.size = entry.isOpenEnded ? fileSize_ - found.offset : found.size;
         entry.isMetaData = !isInsideMetaData && found.holdsMetaData() && !entry.isOpenEnded;
         entry.isForeign = isInsideMetaData && !found.holdsStream();
+        if (isInsideMetaData && !entry.isForeign)
+            entry.stream = streamAt(found.payloadOffset());
         return entry;
     }
 
     std::optional<uuid> streamAt(std::uint64_t offset) {
         MetaDataHeader header;
         std::istream& stream = parser_.getStream();
-        stream.clear();
+        const PositionKept kept(stream);
         stream.seekg(static_cast<std::streamoff>(offset));
         const bool isThere = !stream.read(reinterpret_cast<char*>(&header), sizeof header).fail();
         requireRead(stream, name_);
@@ -107,8 +132,9 @@ private:
 
     const std::string& name_;
     MetaDataParser& parser_;
+    std::uint64_t fileSize_;
     LayoutPart part_;
-    Layout& layout_;
+    const LayoutVisitor& visitor_;
 };
 
 } // namespace
@@ -119,12 +145,9 @@ std::string LayoutItem::headerForm() const {
     return item.isExtended() ? "extended" : "32-bit";
 }
 
-Layout layoutOf(Recording& recording, LayoutPart part) {
-    Layout layout;
-    layout.fileSize = recording.size();
+void walkLayout(Recording& recording, LayoutPart part, const LayoutVisitor& visitor) {
     if (recording.parser().getStreamType() != MetaDataParser::RawStream)
-        layout.items = Walk(recording, part, layout).items(0, layout.fileSize, false);
-    return layout;
+        Walk(recording, part, visitor).run();
 }
 
 } // namespace Zulm

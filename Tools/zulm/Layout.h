@@ -5,9 +5,9 @@
 #include "ZULMetaData/ZULMetaData.h"
 
 #include <cstdint>
+#include <functional>
 #include <optional>
 #include <string>
-#include <vector>
 
 namespace Zulm {
 
@@ -19,9 +19,8 @@ struct LayoutItem {
     bool isForeign = false;                  ///< inside such an item, and no stream
     bool isOpenEnded = false;                ///< has no size: it reaches to the end of the file
     std::optional<ZULMetaData::uuid> stream; ///< the kind of the stream that it is
-    std::vector<LayoutItem> children;
 
-    std::uint64_t size; ///< what it takes of the file; for an open end up to the end of the file
+    std::uint64_t size; ///< what it takes of the file; an open end reaches to the end of the file
 
     /// "32-bit", "extended" or "open-ended".
     std::string headerForm() const;
@@ -33,16 +32,20 @@ struct LayoutEnd {
     std::string reason; ///< a sentence without its full stop
 };
 
-struct Layout {
-    std::uint64_t fileSize = 0;
-    std::vector<LayoutItem> items;
-    std::vector<LayoutEnd> ends; ///< none where everything is filled; those inside metadata atoms too
+/// Gets what a walk meets, in the order of the file. A file may hold millions of items: none is kept.
+struct LayoutVisitor {
+    std::function<void(const LayoutItem& item, bool isChild)> item = [](const LayoutItem&, bool) {};
+
+    /// After the children of an item that holds metadata.
+    std::function<void()> childrenEnd = [] {};
+
+    std::function<void(const LayoutEnd& end)> end = [](const LayoutEnd&) {};
 };
 
-/// Which items are kept. A movie may hold hundreds of thousands that hold no metadata.
+/// Which items are visited. A movie may hold hundreds of thousands that hold no metadata.
 enum class LayoutPart { Whole, MetaData };
 
-/// No items for a bare stream. Throws `Failure` where the file cannot be read.
-Layout layoutOf(Recording& recording, LayoutPart part = LayoutPart::Whole);
+/// Visits the items of a container, and no item of a bare stream. Throws `Failure` if the file cannot be read.
+void walkLayout(Recording& recording, LayoutPart part, const LayoutVisitor& visitor);
 
 } // namespace Zulm

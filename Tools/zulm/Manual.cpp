@@ -61,9 +61,12 @@ const char* const s_aboutOutput =
     "Results are printed to standard output, and everything else to standard error. With --json, a command that "
     "reports "
     "something prints one JSON document: {\"schema\": \"zulm.COMMAND\", \"schema_version\": 1, \"tool_version\": ..., "
-    "\"files\": [...]}. A file that could not be read is not in it. If a command reads a file, the name - stands for "
-    "standard input. Files that a command writes appear whole or not at all. An existing file is replaced only with "
-    "--force.";
+    "\"files\": [...], \"errors\": [...]}. The document is complete even if no file could be read: its errors name "
+    "every file that could not be read and everything that was not found. A time is given in seconds (90, 12.5) or as "
+    "a "
+    "time code (1:30, 0:01:02.5). If a command reads a file, the name - stands for standard input. Files that a "
+    "command "
+    "writes appear whole or not at all. An existing file is replaced only with --force.";
 
 const std::vector<ExitCodeMeaning>& exitCodeMeanings() {
     static const std::vector<ExitCodeMeaning> meanings{
@@ -123,9 +126,14 @@ Manual manualOf(const CLI::App& app) {
     return manual;
 }
 
-std::vector<ManualOption> globalOptions(const Manual& manual) {
+std::vector<ManualOption> globalOptions(const Manual& manual, const ManualCommand& command) {
     std::vector<ManualOption> options = manual.options;
     std::erase_if(options, [](const ManualOption& option) { return option.names.back() == "--version"; });
+    for (const ManualOption& own : command.options)
+        for (ManualOption& option : options)
+            std::erase_if(option.names, [&](const std::string& name) {
+                return std::find(own.names.begin(), own.names.end(), name) != own.names.end();
+            });
     return options;
 }
 

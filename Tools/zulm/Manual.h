@@ -45,8 +45,9 @@ struct Manual {
 Manual manualOf(const CLI::App& app);
 ManualCommand manualOfCommand(const CLI::App& command);
 
-/// The options of the tool that may also stand behind a command: all but --version.
-std::vector<ManualOption> globalOptions(const Manual& manual);
+/// The options of the tool that may also follow the command: all but --version, and without the names that the command
+/// has for options of its own.
+std::vector<ManualOption> globalOptions(const Manual& manual, const ManualCommand& command);
 
 /// The commands' groups in their order.
 std::vector<std::string> groupsOf(const Manual& manual);

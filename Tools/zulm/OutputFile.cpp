@@ -22,9 +22,9 @@ namespace Zulm {
 
 using ZULMetaData::CopyError;
 using ZULMetaData::copyFileRange;
+using ZULMetaData::Descriptor;
 using ZULMetaData::fileOpen;
 using ZULMetaData::renameWithoutReplacing;
-using ZULMetaData::Descriptor;
 using ZULMetaData::uninterrupted;
 
 namespace {

@@ -3,7 +3,8 @@
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/RedactedCopy.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
+#include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 #include "Tools/zulm/TextPattern.h"
@@ -133,14 +134,14 @@ Json streamDocument(const RedactedStream& stream) {
             {"bytes_left_out", stream.bytesLeftOut}};
 }
 
-void report(const RedactOptions& options, const RedactedCopy& copy) {
+Json fileDocument(const RedactOptions& options, const RedactedCopy& copy) {
     Json document = fileHeader(options.file);
     addText(document, "output", options.output);
     document["streams"] = Json::array();
     for (const RedactedStream& stream : copy.streams())
         document["streams"].push_back(streamDocument(stream));
     document["unreachable_streams"] = copy.unreachableStreams();
-    printReport("redact", Json::array({document}));
+    return document;
 }
 
 void print(const RedactOptions& options, const RedactedCopy& copy) {
@@ -155,7 +156,7 @@ void print(const RedactOptions& options, const RedactedCopy& copy) {
     }
 }
 
-ExitCode runRedact(const RedactOptions& options) {
+ExitCode redact(const RedactOptions& options, RunReport& report) {
     const InputFile input(options.file);
     Recording recording(input.path(), input.name());
     requireOutputName(options.output, recording.parser().getStreamType(), input.path());
@@ -172,11 +173,16 @@ ExitCode runRedact(const RedactOptions& options) {
                                   removalText(copy.streams().front().removal)));
     const ExitCode damage = complainAboutDamage(output.temporaryPath(), options.output);
     output.commit();
-    if (options.json)
-        report(options, copy);
-    else
+    if (report.isWanted())
+        report.add(fileDocument(options, copy));
+    else if (!settings().quiet)
         print(options, copy);
     return worseOf(damage, complainAboutWhatIsLeftOut(input.name(), copy));
+}
+
+ExitCode runRedact(const RedactOptions& options) {
+    return withReport("redact", options.json, {options.file, options.output},
+                      [&](RunReport& report) { return redact(options, report); });
 }
 
 } // namespace

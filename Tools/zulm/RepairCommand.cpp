@@ -1,5 +1,6 @@
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 
@@ -50,20 +51,20 @@ void print(const RepairOptions& options, const Repair& repair) {
                                 options.dryRun ? "would be repaired; nothing was changed" : "repaired"));
 }
 
-void report(const RepairOptions& options, const Repair& repair) {
+Json fileDocument(const RepairOptions& options, const Repair& repair) {
     Json file = fileHeader(options.save.movie);
     file["output"] = nullptr;
     if (!repair.output.empty())
         addText(file, "output", repair.output);
     file.update(repairDocument(repair.plan));
-    printReport("repair", Json::array({file}));
+    return file;
 }
 
-ExitCode runRepair(const RepairOptions& options) {
+ExitCode repairMovie(const RepairOptions& options, RunReport& report) {
     const Repair repair = carryOut(options);
-    if (options.json)
-        report(options, repair);
-    else
+    if (report.isWanted())
+        report.add(fileDocument(options, repair));
+    else if (options.dryRun || !settings().quiet)
         print(options, repair);
     if (repair.plan.state == RepairPlan::Unrepairable) {
         complain(unrepairableText(options.save.movie, repair.plan));
@@ -71,6 +72,11 @@ ExitCode runRepair(const RepairOptions& options) {
     }
     const bool isStillDamaged = options.dryRun && repair.plan.state == RepairPlan::Repairable;
     return worseOf(complainAboutLoss(options.save.movie, repair.plan), isStillDamaged ? ExitDamaged : ExitFine);
+}
+
+ExitCode runRepair(const RepairOptions& options) {
+    return withReport("repair", options.json, {options.save.movie, options.save.output},
+                      [&](RunReport& report) { return repairMovie(options, report); });
 }
 
 } // namespace

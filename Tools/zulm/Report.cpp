@@ -8,16 +8,21 @@ namespace Zulm {
 
 using Json = nlohmann::ordered_json;
 
-Json reportHeader(const std::string& command) {
-    return {{"schema", "zulm." + command}, {"schema_version", 1}, {"tool_version", ZULM_VERSION}};
+void beginReport(JsonWriter& writer, const std::string& command) {
+    writer.beginObject();
+    writer.members({{"schema", "zulm." + command}, {"schema_version", 1}, {"tool_version", ZULM_VERSION}});
+    writer.beginArray("files");
 }
 
-std::string jsonLine(const Json& document) {
-    return shownJSON(document.dump(-1, ' ', false, Json::error_handler_t::replace));
-}
-
-std::string reportText(const Json& document) {
-    return shownJSON(document.dump(2, ' ', false, Json::error_handler_t::replace));
+void endReport(JsonWriter& writer, const std::vector<ReportedError>& errors) {
+    writer.endTo(1);
+    writer.beginArray("errors");
+    for (const ReportedError& error : errors) {
+        Json document = fileHeader(error.path);
+        document["message"] = error.message;
+        writer.element(document);
+    }
+    writer.endTo(0);
 }
 
 Json fileHeader(const std::string& path) {

@@ -2,23 +2,28 @@
 
 // The JSON documents of the commands that report.
 
+#include "Tools/zulm/JsonWriter.h"
+
 #include <nlohmann/json.hpp>
 
 #include <optional>
 #include <string>
+#include <vector>
 
 namespace Zulm {
 
-/// {"schema": "zulm.COMMAND", "schema_version": 1, "tool_version": ..., "files": [...]} on standard output.
-void printReport(const std::string& command, nlohmann::ordered_json files);
+/// What a command could not do, or could not find.
+struct ReportedError {
+    std::string path;    ///< of the file that it is about, as it was named
+    std::string message; ///< a sentence without its full stop
+};
 
-/// The same without its files, for a command that prints them as they come.
-nlohmann::ordered_json reportHeader(const std::string& command);
+/// Writes the beginning of {"schema": "zulm.COMMAND", "schema_version": 1, "tool_version": ..., "files": [...],
+/// "errors": [...]}. What is written next are elements of "files".
+void beginReport(JsonWriter& writer, const std::string& command);
 
-/// A document as text, without the end of its last line: in one line, and in several ones. Bytes that are no text show
-/// as U+FFFD, and what cannot be seen as an escape of JSON.
-std::string jsonLine(const nlohmann::ordered_json& document);
-std::string reportText(const nlohmann::ordered_json& document);
+/// Ends what is open, then writes the errors and the end of the document.
+void endReport(JsonWriter& writer, const std::vector<ReportedError>& errors);
 
 /// What is reported of a file begins with: {"path": ...}, and its bytes as "path_base64" where they are not UTF-8.
 nlohmann::ordered_json fileHeader(const std::string& path);

@@ -3,7 +3,8 @@
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Recording.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
+#include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 
@@ -79,34 +80,44 @@ bool isWhole(const SalvagedStream& stream) {
     return stream.origin == SalvagedStream::Reachable && !stream.isCutShort;
 }
 
-ExitCode runSalvage(const SalvageOptions& options) {
+void beginFile(JsonWriter& writer, const std::string& name, bool isComplete) {
+    writer.beginObject();
+    writer.members(fileHeader(name));
+    writer.member("complete", isComplete);
+    writer.beginArray("streams");
+}
+
+ExitCode salvage(const SalvageOptions& options, RunReport& report) {
     const InputFile input(options.file);
-    const SalvageReport report = search(input.path());
-    if (report.streams.empty()) {
+    const SalvageReport found = search(input.path());
+    if (found.streams.empty()) {
         complain(fmt::format("{}: no metadata streams anywhere in it", input.name()));
         return ExitNoMetaData;
     }
     createFolder(options.folder);
-    const std::vector<std::string> outputs = outputsFor(report.streams, options.folder);
+    const std::vector<std::string> outputs = outputsFor(found.streams, options.folder);
     requireFree(outputs, options.force);
-    Json document = fileHeader(input.name());
-    document["complete"] = !report.hasMore;
-    document["streams"] = Json::array();
-    ExitCode worst = report.hasMore ? ExitDamaged : ExitFine;
+    if (report.isWanted())
+        beginFile(report.writer(), input.name(), !found.hasMore);
+    ExitCode worst = found.hasMore ? ExitDamaged : ExitFine;
     for (std::size_t i = 0; i < outputs.size(); ++i) {
-        const SalvagedStream& stream = report.streams[i];
+        const SalvagedStream& stream = found.streams[i];
         writePart(input, stream.offset, stream.bytes, outputs[i], options.force);
         worst = worseOf(worst, isWhole(stream) ? ExitFine : ExitDamaged);
-        document["streams"].push_back(streamDocument(stream, outputs[i]));
-        if (!options.json)
+        if (report.isWanted())
+            report.writer().element(streamDocument(stream, outputs[i]));
+        else if (!settings().quiet)
             print(stream, outputs[i]);
     }
-    if (options.json)
-        printReport("salvage", Json::array({document}));
-    if (report.hasMore)
+    if (found.hasMore)
         complain(fmt::format("{}: has more than {} places that look like streams; the rest was not looked into",
                              input.name(), SalvageReport::s_maximumStreams));
     return worst;
+}
+
+ExitCode runSalvage(const SalvageOptions& options) {
+    return withReport("salvage", options.json, {options.file},
+                      [&](RunReport& report) { return salvage(options, report); });
 }
 
 } // namespace

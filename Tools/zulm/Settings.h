@@ -9,7 +9,7 @@ namespace Zulm {
 enum class ColorMode { Auto, Always, Never };
 
 struct Settings {
-    bool quiet = false;      ///< no messages but errors
+    bool quiet = false;      ///< no messages but errors, and no account of what was done
     bool verbose = false;    ///< say what is done
     bool noProgress = false; ///< no progress line
     ColorMode color = ColorMode::Auto;

@@ -1,6 +1,7 @@
 #include "Tools/zulm/InfoReport.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 
@@ -30,13 +31,13 @@ void print(const StampOptions& options, const std::string& name, const StampResu
                                 shown(creator.name()), shown(options.creator)));
 }
 
-void report(const StampOptions& options, const std::string& name, const StampResult& stamped) {
+Json fileDocument(const StampOptions& options, const std::string& name, const StampResult& stamped) {
     Json file = fileHeader(options.save.movie);
     addText(file, "output", name);
     file.update(Json{{"repair", repairDocument(stamped.repair)},
                      {"creator", creatorDocument(stamped.info.creator)},
                      {"fragment_index", fragmentIndexText(stamped.fragmentIndex)}});
-    printReport("stamp", Json::array({file}));
+    return file;
 }
 
 ExitCode complainAboutCut(const StampOptions& options, const CreatorAttributes& creator) {
@@ -46,19 +47,24 @@ ExitCode complainAboutCut(const StampOptions& options, const CreatorAttributes& 
     return ExitDamaged;
 }
 
-ExitCode runStamp(const StampOptions& options) {
+ExitCode stampMovie(const StampOptions& options, RunReport& report) {
     SavedMovie movie(options.save, {});
     const StampResult stamped = movie.save("stamping " + movie.name(), [&](const SafeMovieSave& save) {
         return save.stamp(options.creator, options.version,
                           options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd
                                              : SafeMovieSave::FragmentIndex::Leave);
     });
-    if (options.json)
-        report(options, movie.name(), stamped);
-    else
+    if (report.isWanted())
+        report.add(fileDocument(options, movie.name(), stamped));
+    else if (!settings().quiet)
         print(options, movie.name(), stamped);
     warnOfFragmentIndex(movie.name(), stamped.fragmentIndex);
     return worseOf(complainAboutLoss(movie.name(), stamped.repair), complainAboutCut(options, stamped.info.creator));
+}
+
+ExitCode runStamp(const StampOptions& options) {
+    return withReport("stamp", options.json, {options.save.movie, options.save.output},
+                      [&](RunReport& report) { return stampMovie(options, report); });
 }
 
 } // namespace

@@ -22,11 +22,6 @@ namespace {
 
 std::array<char, 1 << 16> s_outputBuffer;
 
-/// Whether output failed because nobody is there to read it.
-bool isNobodyThere(int error) {
-    return error == EPIPE || error == EBADF;
-}
-
 } // namespace
 
 void secureStandardStreams() {
@@ -51,7 +46,9 @@ bool flushStandardOutput() {
 }
 
 void complainAboutOutput(int error) {
-    if (!isNobodyThere(error))
+    if (error == EBADF)
+        complain("standard output: is closed, so the result could not be printed");
+    else if (error != EPIPE)
         complain(fmt::format("standard output: cannot be written: {}", std::strerror(error)));
 }
 

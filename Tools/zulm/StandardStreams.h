@@ -17,8 +17,8 @@ void writeOutput(std::string_view bytes);
 /// Sends what is buffered for standard output. False, after a complaint, where it could not be written.
 bool flushStandardOutput();
 
-/// Says that `error` kept standard output from being written; not where nobody reads it any more (a closed stream, a
-/// broken pipe), which is no news to anybody.
+/// Says that `error` kept standard output from being written, but not if its reader has ended: `zulm dump | head` is no
+/// failure that a person wants to hear of.
 void complainAboutOutput(int error);
 
 /// `text` in bold where standard output may be coloured.

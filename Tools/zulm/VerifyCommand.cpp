@@ -2,7 +2,8 @@
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/Findings.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/Report.h"
+#include "Tools/zulm/RunReport.h"
+#include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 #include "Tools/zulm/VerifyReport.h"
@@ -18,7 +19,6 @@
 namespace Zulm {
 
 using namespace ZULMetaData;
-using Json = nlohmann::ordered_json;
 
 namespace {
 
@@ -82,6 +82,8 @@ void print(const std::string& name, const ValidationReport& report, bool isStric
     if (const std::uint64_t unlisted = report.damageCount + report.noticeCount - findings.size(); unlisted > 0)
         writeOutput(
             fmt::format("{}: {} not listed\n", shown(name), counted(unlisted, "more finding is", "more findings are")));
+    if (settings().quiet)
+        return;
     if (isFine(report, isStrict) && report.hasMetaData())
         writeOutput(fmt::format("{}: ok ({}, {})\n", shown(name), counted(report.streamCount, "stream", "streams"),
                                 counted(report.wholeEntries, "entry", "entries")));
@@ -100,23 +102,26 @@ void advise(const std::string& name, const ValidationReport& report) {
                          shellWord(name)));
 }
 
+ExitCode verify(const VerifyOptions& options, const std::string& path, RunReport& report) {
+    const InputFile input(path);
+    const ValidationReport found = validate(input, options.ignored);
+    if (report.isWanted())
+        report.add(verifyDocument(input.name(), found));
+    else
+        print(input.name(), found, options.isStrict);
+    advise(input.name(), found);
+    const ExitCode code = exitCodeFor(found, options.isStrict);
+    if (code == ExitNoMetaData)
+        report.note(path, "has no recording metadata");
+    return code;
+}
+
 ExitCode runVerify(const VerifyOptions& options) {
     if (options.listsRules)
         return listRules();
-    Json files = Json::array();
-    const ExitCode code = forEachFile(options.files, [&](const std::string& path) {
-        const InputFile input(path);
-        const ValidationReport report = validate(input, options.ignored);
-        if (options.json)
-            files.push_back(verifyDocument(input.name(), report));
-        else
-            print(input.name(), report, options.isStrict);
-        advise(input.name(), report);
-        return exitCodeFor(report, options.isStrict);
+    return withReport("verify", options.json, options.files, [&](RunReport& report) {
+        return forEachFile(options.files, [&](const std::string& path) { return verify(options, path, report); });
     });
-    if (options.json)
-        printReport("verify", std::move(files));
-    return code;
 }
 
 } // namespace

@@ -32,7 +32,7 @@ Json viewDocument(Recording& recording, const Json& movie) {
             {"tool_version", ZULM_VERSION},
             {"name", validText(name)},
             {"moviePoster", nullptr},
-            {"info", infoDocument(inspect(recording))},
+            {"info", infoDocument(recording)},
             {"verify", verifyDocument(recording.name(), recording.validation())},
             {"metadata", base64(excerpt)},
             {"movie", movie}};

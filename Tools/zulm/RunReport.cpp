@@ -1,0 +1,68 @@
+#include "Tools/zulm/RunReport.h"
+
+#include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/Text.h"
+
+#include <utility>
+
+namespace Zulm {
+
+namespace {
+
+constexpr std::size_t s_filesDepth = 2; // the document and its "files"
+
+} // namespace
+
+RunReport* RunReport::s_current = nullptr;
+
+RunReport::RunReport(const std::string& command, bool isWanted, std::vector<std::string> files, JsonWriter::Style style)
+    : isWanted_(isWanted), files_(std::move(files)), workedOn_(files_.empty() ? std::string() : files_.front()),
+      writer_(writeOutput, style) {
+    if (isWanted_)
+        beginReport(writer_, command);
+    s_current = this;
+}
+
+RunReport::~RunReport() {
+    s_current = nullptr;
+}
+
+void RunReport::workOn(const std::string& file) {
+    if (isWanted_)
+        writer_.endTo(s_filesDepth);
+    workedOn_ = file;
+}
+
+void RunReport::note(const std::string& file, const std::string& message) {
+    if (isWanted_)
+        errors_.push_back({file, validText(message)});
+}
+
+void RunReport::noteComplaint(const std::string& line) {
+    const auto isAbout = [&line](const std::string& file) { return line.starts_with(file + ": "); };
+    std::string file = isAbout(workedOn_) ? workedOn_ : std::string();
+    for (const std::string& candidate : files_)
+        if (candidate.size() > file.size() && isAbout(candidate))
+            file = candidate;
+    if (file.empty())
+        note(workedOn_, line);
+    else
+        note(file, line.substr(file.size() + 2));
+}
+
+void RunReport::end() {
+    if (isWanted_) {
+        endReport(writer_, errors_);
+        writeOutput("\n");
+    }
+}
+
+ExitCode withReport(const std::string& command, bool isWanted, const std::vector<std::string>& files,
+                    const std::function<ExitCode(RunReport& report)>& work, JsonWriter::Style style) {
+    RunReport report(command, isWanted, files, style);
+    const ExitCode code = orComplaint([&] { return work(report); });
+    report.end();
+    return code;
+}
+
+} // namespace Zulm

@@ -1,0 +1,64 @@
+#pragma once
+
+// What a command with --json prints: one JSON document for the whole run, written while the files are worked on.
+
+#include "Tools/zulm/Command.h"
+#include "Tools/zulm/Report.h"
+
+#include <functional>
+#include <string>
+#include <vector>
+
+namespace Zulm {
+
+/// The document of one run. While it exists, what is complained of is kept for the document's "errors".
+class RunReport {
+public:
+    /// Writes the beginning of the document of `command` if `isWanted`; if not, nothing is written at all. `files` are
+    /// the names that complaints may begin with. A complaint that begins with none of them is about the file that is
+    /// being worked on, which is the first one until `workOn` says otherwise.
+    RunReport(const std::string& command, bool isWanted, std::vector<std::string> files, JsonWriter::Style style);
+    ~RunReport();
+    RunReport(const RunReport&) = delete;
+    RunReport& operator=(const RunReport&) = delete;
+
+    bool isWanted() const { return isWanted_; }
+
+    /// Adds the object of a file. Only for a report that is wanted.
+    void add(const nlohmann::ordered_json& file) { writer_.element(file); }
+
+    /// For the object of a file that is written in pieces. Only for a report that is wanted.
+    JsonWriter& writer() { return writer_; }
+
+    /// Ends what is open of the object of the file before this one.
+    void workOn(const std::string& file);
+
+    /// Keeps an error that standard error does not tell.
+    void note(const std::string& file, const std::string& message);
+
+    /// Keeps a line of standard error.
+    void noteComplaint(const std::string& line);
+
+    /// Writes the errors and the end of the document.
+    void end();
+
+    /// The one that exists, or null.
+    static RunReport* current() { return s_current; }
+
+private:
+    static RunReport* s_current;
+
+    bool isWanted_;
+    std::vector<std::string> files_;
+    std::string workedOn_;
+    std::vector<ReportedError> errors_;
+    JsonWriter writer_;
+};
+
+/// Runs `work` with the report of `command`. Whatever goes wrong with it is complained of, and the document is whole
+/// all the same. Throws only if standard output cannot be written.
+ExitCode withReport(const std::string& command, bool isWanted, const std::vector<std::string>& files,
+                    const std::function<ExitCode(RunReport& report)>& work,
+                    JsonWriter::Style style = JsonWriter::Style::Indented);
+
+} // namespace Zulm
