@@ -24,9 +24,9 @@ py::dtype typeOfEntries(const uuid& kind);
 /// Of its fields the coordinates: numbers of which the library's writers for applications cut fractions off.
 py::list coordinatesOf(const uuid& kind);
 
-/// Every whole entry that fits the kind. Numbers stay where they were read to, in memory that the array keeps; texts
-/// end in front of their first zero byte, and of their other bytes those that are not UTF-8 become lone surrogates.
-/// Throws `ValueError` for a stream whose version is not known.
+/// Returns every whole entry that fits the kind. Numbers stay where they were read to, in memory that the array keeps.
+/// Texts are whole; bytes in them that are not UTF-8 become lone surrogates. Throws `ValueError` for a stream whose
+/// version is not known.
 py::array readEntries(const StreamSource& stream);
 
 } // namespace ZULMetaData::Python

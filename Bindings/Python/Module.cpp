@@ -7,6 +7,7 @@
 #include "ZULMetaData/MovieDuration.h"
 #include "ZULMetaData/RecordingInfo.h"
 #include "ZULMetaDataBridge/Source/HumanReadableActions.h"
+#include "ZULMetaDataBridge/Source/KeyNames.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
 #include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
@@ -247,9 +248,10 @@ void addKinds(py::module_& module) {
         "Returns the names of all kinds that have entries.");
     module.def("action_text", &HumanReadableActions::CursorActionToString, py::arg("action"),
                "Returns a text such as \"left down + shift\" for a \"rawActionValue\" of cursorAction.");
-    module.def("key_text", keyText, py::arg("code"), py::arg("flags") = 0,
-               "Returns the name of a key, for \"characterCode\" and \"eventFlagsCode\" of keyboardAction. Without the flag "
-               "(IsVK) the code is that of a character.");
+    module.def(
+        "key_text", keyText, py::arg("code"), py::arg("flags") = 0,
+        "Returns the name of a key, for \"characterCode\" and \"eventFlagsCode\" of keyboardAction. Without the flag "
+        "(IsVK) the code is that of a character.");
     module.def(
         "modifiers_text",
         [](std::uint32_t flags) {

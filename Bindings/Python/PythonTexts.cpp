@@ -1,7 +1,5 @@
 #include "Bindings/Python/PythonTexts.h"
 
-#include <algorithm>
-
 namespace ZULMetaData::Python {
 
 namespace {
@@ -15,8 +13,7 @@ py::str requireText(PyObject* text) {
 } // namespace
 
 py::str pythonText(const std::string& bytes) {
-    const std::size_t length = std::min(bytes.find('\0'), bytes.size());
-    return requireText(PyUnicode_DecodeUTF8(bytes.data(), static_cast<py::ssize_t>(length), "surrogateescape"));
+    return requireText(PyUnicode_DecodeUTF8(bytes.data(), static_cast<py::ssize_t>(bytes.size()), "surrogateescape"));
 }
 
 py::str pathText(const std::string& bytes) {

@@ -10,7 +10,7 @@ namespace ZULMetaData::Python {
 
 namespace py = pybind11;
 
-/// A text of a file, up to its first zero byte. Bytes that are not UTF-8 become lone surrogates.
+/// A text of a file, with what follows a zero byte in it. Bytes that are not UTF-8 become lone surrogates.
 py::str pythonText(const std::string& bytes);
 
 /// A path, or a sentence with a path in it, as `os.fsdecode` gives it.

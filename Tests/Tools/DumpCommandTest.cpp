@@ -179,7 +179,7 @@ TEST_F(DumpCommand, ShowsNumbersAsTheyAreStored) {
     EXPECT_EQ(opacities.at(0).at("opacity"), 1e39);
     EXPECT_EQ(opacities.at(1).at("opacity"), 0.1);
     EXPECT_EQ(opacities.at(2).at("opacity"), "Infinity");
-    const std::string cursor = raw(0xfedcba9876543210U) + le32(8) + le32(0);
+    const std::string cursor = raw(0xfedcba9876543210U) + le32(8) + le32(0) + le32(3);
     const auto images = entriesOf(streamHeader("2b7b6af1", 1, 0) + le32(28) + f64(1) + cursor);
     EXPECT_EQ(images.at(0).at("id"), "18364758544493064720");
 }

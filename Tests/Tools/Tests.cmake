@@ -39,6 +39,7 @@ zulm_add_tests(ToolsTests
   SalvageCommandTest
   SchemaTest
   StampCommandTest
+  TextTest
   ToolRunTest
   VerifyCommandTest
   ViewCommandTest)

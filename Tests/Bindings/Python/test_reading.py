@@ -10,6 +10,9 @@ import zulmetadata
 from conftest import sample_entries
 
 CURSOR_LOCATION = bytes.fromhex("2b7b6af27a1f11e283d00017f200be7f")
+CURSOR_OPACITY = bytes.fromhex("2b7b6af37a1f11e283d00017f200be7f")
+KEYBOARD_ACTION = bytes.fromhex("2b7b6af57a1f11e283d00017f200be7f")
+TOPMOST_APP_NAME = bytes.fromhex("2b7b6a067a1f11e283d00017f200be7f")
 OWN = bytes.fromhex("5d1c0a6e0b7f4c359e0d43a16b2f8817")
 
 
@@ -152,3 +155,19 @@ def test_texts_for_input_actions():
     assert [zulmetadata.key_text(code) for code in (13, ord("w"), 0xE9, 0x444)] == ["returnKey", "w", "é", "ф"]
     assert [zulmetadata.key_text(code, 0x40000000) for code in (32, 119, 200)] == ["space", "f8", "key 200"]
     assert zulmetadata.modifiers_text(0x00120000) == "<Shift><Cmd>"
+
+
+def test_texts_are_whole(tmp_path):
+    file = tmp_path / "names.dat"
+    text = b"a\0secret\xff"
+    entry = struct.pack("<Id", 8 + len(text), 1.5) + text
+    file.write_bytes(stream(TOPMOST_APP_NAME, 1, 0, entry))
+    assert zulmetadata.Recording(file)["topmostAppName"].tolist() == [(1.5, "a\0secret\udcff")]
+
+
+def test_numbers_keep_their_range(tmp_path):
+    file = tmp_path / "keys.dat"
+    file.write_bytes(stream(KEYBOARD_ACTION, 1, 16, struct.pack("<dII", 1, 2**32 - 1, 0xC0000000)))
+    assert zulmetadata.Recording(file)["keyboardAction"].tolist() == [(1, 2**32 - 1, 0xC0000000)]
+    file.write_bytes(stream(CURSOR_OPACITY, 1, 16, struct.pack("<dd", 1, 1e39)))
+    assert zulmetadata.Recording(file)["cursorOpacity"]["opacity"].tolist() == [1e39]

@@ -26,15 +26,15 @@ test('keys are called as the tool calls them', () => {
   assert.equal(label(65, 'A', '<Shift>(IsVK)'), 'A');
   assert.equal(label(65, 'A', 'NONE'), 'A');
   assert.equal(label(83, 'S', '<Shift><Cmd>(IsVK)'), '⇧⌘S');
-  assert.equal(label(32, 'space', 'NONE'), ' ');
-  assert.equal(label(53, 'percent', 'NONE'), '5');
+  assert.equal(label(32, ' ', 'NONE'), ' ');
+  assert.equal(label(53, '5', 'NONE'), '5');
   assert.equal(label(53, 'percent', '<Shift>(IsVK)'), '%');
-  assert.equal(label(190, 'period', 'NONE'), '.');
+  assert.equal(label(190, 'period', '(IsVK)'), '.');
   assert.equal(label(13, 'returnKey', 'NONE'), '[returnKey]');
   assert.equal(label(38, 'up', '<Ctrl>(IsVK)'), '⌃[up]');
-  assert.equal(label(0x20ac, '¬', 'NONE'), '€');
-  assert.equal(label(0xd800, '', 'NONE'), '[key 55296]');
-  assert.equal(label(1, '\u0001', 'NONE'), '[key 1]');
+  assert.equal(label(0x20ac, '€', 'NONE'), '€');
+  assert.equal(label(0xd800, 'key 55296', 'NONE'), '[key 55296]');
+  assert.equal(label(1, 'key 1', 'NONE'), '[key 1]');
 });
 
 test('what was typed is masked, keys that type nothing are not', () => {
@@ -42,7 +42,8 @@ test('what was typed is masked, keys that type nothing are not', () => {
   assert.equal(label(65, 'A', '<Cmd>(IsVK)', false), '⌘•');
   assert.equal(label(13, 'returnKey', 'NONE', false), '[returnKey]');
   assert.equal(label(38, 'up', '(IsVK)', false), '[up]');
-  assert.equal(label(39, 'right', 'NONE', false), '•'); // an apostrophe has the same number
+  assert.equal(label(39, "'", 'NONE', false), '•');
+  assert.equal(label(97, 'key 97', '(IsVK)', false), '•'); // it may type a character
 });
 
 test('keys near each other make a caption, Return ends it', () => {
