@@ -82,7 +82,7 @@ public:
         entries_.erase(found);
         if (cursor.imageDataSize > 0)
             return cursor;
-        std::string bytes(entry.size, '\0');
+        std::string bytes(static_cast<std::size_t>(entry.size), '\0');
         bytes.resize(read_(entry.offset, {bytes.data(), bytes.size()}));
         auto pictured = decodeEntry<CursorImage>(bytes, version);
         if (!pictured)
