@@ -17,8 +17,10 @@ namespace {
 
 using Side = CopyError::Side;
 
-constexpr std::uint64_t s_bufferSize = 1 << 20;  // in bytes
-constexpr std::uint64_t s_systemCopy = 64 << 20; // in bytes: what the system copies between two reports of progress
+constexpr std::uint64_t s_bufferSize = 1 << 20; // in bytes
+
+/// What the system copies between two reports of progress, in bytes.
+[[maybe_unused]] constexpr std::uint64_t s_systemCopy = 64 << 20;
 
 [[noreturn]] void fail(Side side, int error, const std::string& what) {
     throw CopyError(side, what + ": " + std::strerror(error));
@@ -51,6 +53,7 @@ public:
     }
 
 private:
+#if defined(SEEK_DATA) && defined(SEEK_HOLE)
     /// Where stored bytes begin, at `position` or after it.
     std::uint64_t nextData(std::uint64_t position) const {
         const off_t data = lseek(source_.number(), static_cast<off_t>(position), SEEK_DATA);
@@ -65,6 +68,14 @@ private:
         const bool isFound = hole >= 0 && static_cast<std::uint64_t>(hole) > position;
         return isFound ? std::min(static_cast<std::uint64_t>(hole), end_) : end_;
     }
+#else
+    std::uint64_t nextData(std::uint64_t position) const {
+        return position;
+    }
+    std::uint64_t nextHole(std::uint64_t) const {
+        return end_;
+    }
+#endif
 
     std::uint64_t sourceSize() const {
         const off_t size = lseek(source_.number(), 0, SEEK_END);
@@ -98,7 +109,7 @@ private:
 
     std::uint64_t copyByHand(std::uint64_t position, std::uint64_t size) {
         buffer_.resize(s_bufferSize);
-        const std::size_t wanted = std::min<std::uint64_t>(size, buffer_.size());
+        const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(size, buffer_.size()));
         const ssize_t got = uninterrupted(
             [&] { return pread(source_.number(), buffer_.data(), wanted, static_cast<off_t>(position)); });
         if (got < 0)
@@ -136,12 +147,12 @@ private:
     std::uint64_t offset_;
     std::uint64_t end_;
     const CopyProgress& progress_;
-    bool systemCopies_ = true;
+    [[maybe_unused]] bool systemCopies_ = true;
     std::vector<char> buffer_;
 };
 
 /// One step that takes the name and fails if it is taken; -1 with `errno` otherwise, as a system call.
-int renameIntoFreeName(const FileLocation& from, const FileLocation& to) {
+int renameIntoFreeName([[maybe_unused]] const FileLocation& from, [[maybe_unused]] const FileLocation& to) {
 #if defined(__linux__)
     return renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE);
 #elif defined(__APPLE__)
