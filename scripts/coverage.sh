@@ -14,7 +14,7 @@ cmake --build --preset coverage
 
 echo "== testing"
 find build/coverage -name '*.gcda' -delete
-ctest --preset coverage --progress
+scripts/ctest.sh coverage
 
 echo "== coverage"
 page=()

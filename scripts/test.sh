@@ -20,4 +20,4 @@ cmake --preset "$preset" -DZULMETADATA_BUILD_TESTS=ON "${viewer[@]}" >/dev/null 
 cmake --build --preset "$preset"
 
 echo "== testing ($preset)"
-ctest --preset "$preset" --progress --no-tests=error
+scripts/ctest.sh "$preset"
