@@ -13,6 +13,10 @@ function(zulm_library target name)
     VISIBILITY_INLINES_HIDDEN ON)
   # A project around this one may have folders of the same names on its own list.
   target_include_directories(${target} BEFORE PRIVATE ${PROJECT_SOURCE_DIR})
+  # Static ones go into shared libraries as well, such as the package for Python, without being compiled again.
+  if(NOT EMSCRIPTEN)
+    set_target_properties(${target} PROPERTIES POSITION_INDEPENDENT_CODE ON)
+  endif()
   get_target_property(type ${target} TYPE)
   if(type STREQUAL "STATIC_LIBRARY")
     target_compile_definitions(${target} PUBLIC ZULMETADATA_STATIC)

@@ -8,9 +8,13 @@ folder=${1:-demo-output}
 
 scripts/install.sh build media viewer
 
+# The build is that of scripts/test.sh, so that neither compiles again what the other has compiled.
 echo "== building"
-cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF -DZULM_BUILD_VIEWER=ON >/dev/null
-cmake --build --preset release --target zulm
+tests=()
+[ -f build/dev/CMakeCache.txt ] || tests=(-DZULMETADATA_BUILD_TESTS=OFF) # the packages that they need may be missing
+cmake --preset dev "${tests[@]}" -DZULM_BUILD_VIEWER=ON >/dev/null
+cmake --build --preset dev --target zulm
+zulm=build/dev/Tools/zulm/zulm
 
 echo "== making a movie of 20 seconds"
 mkdir -p "$folder"
@@ -21,17 +25,17 @@ scripts/desktop-movie.sh "$plain"
 packets_before=$(ffmpeg -v error -i "$plain" -map 0 -c copy -f streamhash -)
 
 echo "== recording a session and reading it back out of the movie"
-build/release/Tools/zulm/zulm demo "$folder" --movie "$plain" --force
+"$zulm" demo "$folder" --movie "$plain" --force
 
 echo "== the movie's pictures and sound are what they were"
 [ "$(ffmpeg -v error -i "$movie" -map 0 -c copy -f streamhash -)" = "$packets_before" ]
 ffprobe -v error -show_entries stream=codec_name,duration -of compact=nokey=1:print_section=0 "$movie"
 
 echo "== what zulm shows of it"
-build/release/Tools/zulm/zulm info "$movie"
+"$zulm" info "$movie"
 
 echo "== writing a page that shows it playing"
-build/release/Tools/zulm/zulm view "$movie" -o "$folder/Recording.html" --force
+"$zulm" view "$movie" -o "$folder/Recording.html" --force
 
 echo
 echo "The movie is $movie, its stream files are in $folder/streams."
