@@ -6,7 +6,6 @@ function(zulm_add_tests program)
   add_executable(${program} ${files})
   target_link_libraries(${program} PRIVATE ZULMetaDataTestSupport)
   zulm_project_options(${program})
-  set_target_properties(${program} PROPERTIES UNITY_BUILD OFF) # each file has helpers of its own, which may have equal names
   zulm_reuse_precompiled_headers(${program} ZULMetaDataTestSupport)
 
   set(discovery ${CMAKE_CURRENT_BINARY_DIR}/${program}.discovery.cmake)

@@ -8,7 +8,7 @@ build=${BUILD:-build/abi}
 
 scripts/install.sh build abi
 cmake --preset release -B "$build" -DCMAKE_BUILD_TYPE=RelWithDebInfo -DBUILD_SHARED_LIBS=ON \
-    -DZULMETADATA_BUILD_TESTS=OFF -DZULMETADATA_BUILD_TOOLS=OFF >/dev/null
+    -DCMAKE_UNITY_BUILD=OFF -DZULMETADATA_BUILD_TESTS=OFF -DZULMETADATA_BUILD_TOOLS=OFF >/dev/null
 cmake --build "$build" -- --quiet
 rm -rf "$build/installed"
 cmake --install "$build" --prefix "$build/installed" >/dev/null

@@ -24,6 +24,7 @@ class BuildByCMake(build_ext):
         build = BUILD / "cmake"
         subprocess.run(
             ["cmake", "-S", PROJECT, "-B", build, "-DCMAKE_BUILD_TYPE=Release", "-DBUILD_SHARED_LIBS=OFF",
+             "-DCMAKE_UNITY_BUILD=ON",
              "-DZULMETADATA_BUILD_PYTHON=ON", f"-DPython_EXECUTABLE={sys.executable}",
              f"-Dpybind11_DIR={pybind11.get_cmake_dir()}", "-DZULMETADATA_BUILD_TESTS=OFF",
              "-DZULMETADATA_BUILD_TOOLS=OFF", "-DZULMETADATA_INSTALL=OFF"],

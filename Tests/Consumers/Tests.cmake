@@ -15,12 +15,14 @@ set(folder ${PROJECT_BINARY_DIR}/consumers)
 set(static ${folder}/static)
 set(shared ${folder}/shared)
 
+get_target_property(unity ZULMetaData UNITY_BUILD) # what builds the library once more does it as this build does
+
 add_test(NAME Consumers/install_static COMMAND
   ${CMAKE_COMMAND} -DBUILD=${PROJECT_BINARY_DIR} -DPREFIX=${static} -P ${sources}/InstallStatic.cmake)
 add_test(NAME Consumers/install_shared COMMAND
   ${CMAKE_COMMAND} -DSOURCE=${PROJECT_SOURCE_DIR} -DBUILD=${folder}/shared-build -DPREFIX=${shared}
   -DGENERATOR=${CMAKE_GENERATOR} -DCOMPILER=${CMAKE_CXX_COMPILER} -DLAUNCHER=${CMAKE_CXX_COMPILER_LAUNCHER}
-  -P ${sources}/InstallShared.cmake)
+  -DUNITY=${unity} -P ${sources}/InstallShared.cmake)
 set_tests_properties(Consumers/install_static PROPERTIES FIXTURES_SETUP static_package)
 set_tests_properties(Consumers/install_shared PROPERTIES FIXTURES_SETUP shared_package)
 
@@ -29,7 +31,7 @@ function(zulm_add_cmake_consumer name project program)
   add_test(NAME Consumers/${name} COMMAND ${CMAKE_CTEST_COMMAND} --build-and-test
     ${sources}/${project} ${folder}/${name} --build-generator ${CMAKE_GENERATOR}
     --build-options ${ARGN} -DCMAKE_CXX_COMPILER_LAUNCHER=${CMAKE_CXX_COMPILER_LAUNCHER} -DCMAKE_BUILD_TYPE=Debug
-    -DCMAKE_EXPORT_NO_PACKAGE_REGISTRY=ON --test-command ${program})
+    -DCMAKE_UNITY_BUILD=${unity} -DCMAKE_EXPORT_NO_PACKAGE_REGISTRY=ON --test-command ${program})
 endfunction()
 zulm_add_cmake_consumer(find_package find_package application
   -DCMAKE_PREFIX_PATH=${shared} -DCMAKE_CXX_COMPILER=${CMAKE_CXX_COMPILER} -DEXPECT_TOOLS=FALSE -DEXPECT_VIEWER=FALSE)
