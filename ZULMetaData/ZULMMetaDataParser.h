@@ -17,55 +17,58 @@
 
 namespace ZULMetaData {
 
-/// Scans its file once, when it is created, and then serves reads from the ranges that it found. Holds one stream
-/// position: calls must not overlap.
+/// Finds the streams of a file once, when it is created, and then reads from the places that it found. A parser has a
+/// single read position, so calls must not overlap.
 class ZULMETADATA_API MetaDataParser {
 public:
-    /// RIFF chunks, the atoms of a movie, or a stream file without a container around it.
+    /// The types of files: RIFF chunks, the atoms of a movie, or a stream file without a container.
     enum StreamType : std::int32_t { Unknown, Riff, QuickTime, RawStream };
 
-    /// Where a stream is: from its header on. Both 0 for a kind that is not there. The length is what the
-    /// container declares, which may be more than the file holds.
+    /// The place of a stream. Both numbers are 0 for a kind that the file does not have. The length is the one that the
+    /// container declares; it may be larger than the file.
     struct CachedFileData {
-        std::uint64_t offset; ///< of its header, in the file
-        std::uint64_t length; ///< in bytes, header included
+        std::uint64_t offset; ///< the position of the header in the file
+        std::uint64_t length; ///< the number of bytes, header included
     };
 
-    /// Opens a file and keeps it open. The extension tells the container: .avi and .wav, .mp4, .mov and .zcap, or
-    /// .dat, in any case. Null for any other, and for a file that cannot be opened (one line on standard error).
+    /// Opens a file and keeps it open. The extension decides the type: .avi and .wav, .mp4, .mov and .zcap, or .dat, in
+    /// upper or lower case. Returns null for any other extension, and if the file cannot be opened; in that case it
+    /// prints a line on standard error.
     static std::unique_ptr<MetaDataParser> create(const std::string& path);
 
-    /// The container that the extension of `path` tells, without a look at the file.
+    /// Returns the type that the extension of `path` decides. Does not open the file.
     static StreamType streamTypeOf(const std::string& path);
 
-    /// Reads from a stream of the caller, which must outlive the parser and is never closed. Null where its state
-    /// is not good (one line on standard error) or the type is `Unknown`.
+    /// Reads from a stream of the caller, which must outlive the parser and is never closed. Returns null if `type` is
+    /// `Unknown`, and if the state of the stream is not good; in that case it prints a line on standard error.
     static std::unique_ptr<MetaDataParser> create(std::istream& stream, StreamType type);
 
     virtual ~MetaDataParser() = default;
-    virtual StreamType getStreamType() const = 0; ///< as the extension of its file tells, or as `create` was told
-    virtual std::istream& getStream() = 0;        ///< stays the parser's, or the caller's; reading moves its position
+    virtual StreamType getStreamType() const = 0; ///< returns the type that was used to find the streams
+    virtual std::istream& getStream() = 0;        ///< returns the stream that is read; its owner does not change
 
-    /// Of a file: what was found stays known, but cannot be read. Of a caller's stream: nothing.
+    /// Closes a file that the parser opened. The places stay known, but the streams cannot be read any more. Does
+    /// nothing if the stream belongs to the caller.
     virtual void close() = 0;
 
     MetaDataParser(const MetaDataParser&) = delete;
     MetaDataParser& operator=(const MetaDataParser&) = delete;
 
-    /// In ascending order.
+    /// Returns the kinds that were found, in ascending order.
     std::vector<uuid> getAvailableMetaDataUUIDs() const;
 
-    CachedFileData fileDataForUUID(const uuid& type) const; ///< of several streams of a kind the last one
+    CachedFileData fileDataForUUID(const uuid& type) const; ///< returns the last stream of the kind
 
-    /// Delivers a stream as `MetaDataReader<T>::parseStream` does; nothing where there is no such stream.
+    /// Delivers the entries of a stream as `MetaDataReader<T>::parseStream` does. Does nothing if there is no such
+    /// stream.
     template <StreamValue T>
     void loadDataType(const uuid& type, DataStreamObserver<T>& observer, int version);
 
-    /// Copies the bytes of every stream, as far as the file holds them. Leaves out what cannot be reached.
+    /// Copies the bytes of every stream that can be read, up to the end of the file.
     void loadAllData(std::map<uuid, std::string>& out);
 
-    /// Scans anew, forgetting what was found before. False for `Unknown` alone. A stream that stands in an error
-    /// or end-of-file state must be cleared first, or nothing is found.
+    /// Forgets what was found and searches again. Returns false only for the type `Unknown`. If the stream is in an
+    /// error or end-of-file state, clear it first; otherwise nothing is found.
     bool cacheFileStreamInfo();
 
 protected:
@@ -78,46 +81,50 @@ private:
     std::map<uuid, CachedFileData> cache_;
 };
 
-/// Helpers on a stream of `total` bytes. The readers move its position and fail, giving false, where the total
-/// leaves too little.
+/// Helpers for a stream of `total` bytes. The functions that read move the position of the stream, and return false if
+/// too few bytes are left.
 namespace ParserUtil {
 
-/// -1 for a stream that has failed. Keeps the position.
+/// Returns the size of the file, or -1 if the stream has failed. Does not change the position.
 ZULMETADATA_API std::int64_t calcFileSize(std::istream& stream);
 
-/// Whether `needed` bytes lie between the stream's position, which stays, and the total.
+/// Returns whether at least `needed` bytes follow the position of the stream. Does not change the position.
 ZULMETADATA_API bool enoughBytesLeft(std::istream& stream, std::uint64_t total, std::uint64_t needed);
 
-/// Any 32-bit size below 8, not only 1, is followed by a 64-bit one. The size counts the whole atom.
+/// Reads the header of an atom. The size includes the header. After a 32-bit size below 8, and not only after 1, a size
+/// of 64 bits is read.
 ZULMETADATA_API bool readAtomSizeAndType(std::istream& stream, std::uint64_t total, std::uint64_t& size,
                                          std::uint32_t& type);
 
-/// The type as it is stored; the size counts the chunk's data.
+/// Reads the header of a chunk. The size does not include the header. The type is returned as it is stored.
 ZULMETADATA_API bool readChunkTypeAndSize(std::istream& stream, std::uint64_t total, std::uint32_t& type,
                                           std::uint32_t& size);
 
 } // namespace ParserUtil
 
-/// Appends streams to a movie as one `ZULM` atom of `DATA` atoms. A trailing partial entry is left out, but the
-/// size of its `DATA` atom counts it. Both throw `std::runtime_error` "Got an entry size of 0" for such an entry
-/// in a stream of entries that vary in size; the atom then keeps a size of 0, which `finalizeAtomsInFile` mends.
+/// Appends streams to a movie as one `ZULM` atom of `DATA` atoms. An incomplete entry at the end of a stream is left
+/// out, but the size of the `DATA` atom includes it. If entries vary in size and one has a size of 0, both functions
+/// throw `std::runtime_error` "Got an entry size of 0". The atom then keeps a size of 0, which `finalizeAtomsInFile`
+/// repairs.
 struct ZULMETADATA_API MP4MetaData {
-    /// False, with a line on standard output, where the movie or one of the streams cannot be opened. The other
-    /// streams are appended all the same.
+    /// Appends stream files. If the movie or a stream file cannot be opened, prints a line on standard output and
+    /// returns false. The other streams are appended anyway.
     static bool appendMetaDataFiles(const std::string& path, const std::vector<std::string>& files);
 
-    /// The same from memory, in ascending order of the kinds. Failures are silent.
+    /// Appends streams from memory, in ascending order of their kinds. Failures are not reported.
     static void appendMetaData(const std::string& path, const std::map<uuid, std::string>& streams);
 };
 
-/// What is done to a finished movie.
+/// Operations on a finished movie.
 struct ZULMETADATA_API Util {
-    /// Gives the last atom of a movie that was cut short its real size. True where the atoms (now) fill the file.
-    /// An open-ended atom of 4 GiB and more needs the 8 spare bytes of a `wide` atom in front of it; it then gets
-    /// the length that it had without them, 8 bytes less than it now has.
+    /// Sets the size of the last atom in a movie that was not finished. Returns true if the atoms fill the file
+    /// afterwards. An atom without a size that has 4 GiB or more needs the 8 spare bytes of a `wide` atom before it. It
+    /// then gets the length that it had without them, which is 8 bytes less than its real length.
     static bool finalizeAtomsInFile(const std::string& path);
 
-    /// The last value of the scale factor's stream read as a 64-bit float, or 1.0 where there is none.
+    /// Returns the last value in the stream of the scale factor, read as a 64-bit floating-point number, or 1.0 if
+    /// there is none. The stream holds integers, so the result is meaningless; read it with
+    /// `ScaleFactorMetaDataParser`.
     static double recordingScaleForMP4AtPath(const std::string& path);
 };
 

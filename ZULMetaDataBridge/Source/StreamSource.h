@@ -1,7 +1,7 @@
 #pragma once
 
-// One metadata stream that is to go into a movie, wherever its bytes are: in a stream file, inside another recording,
-// or in memory.
+// A metadata stream that will be attached to a movie. Its bytes are in a stream file, inside another recording, or in
+// memory.
 
 #include "../../Platform/FileLocation.h"
 #include "../../SharedDependencies/Callback.h"
@@ -14,13 +14,14 @@
 
 namespace ZULMetaData {
 
-/// Opens nothing before it is used. Copies are the same stream.
+/// The source of a stream. It opens its file only when it is used. Copies refer to the same stream.
 class ZULMETADATA_API StreamSource {
 public:
-    /// A whole stream file.
+    /// Returns a source for a whole stream file.
     static StreamSource file(const FileLocation& file);
 
-    /// `length` bytes of a file from `offset` on, or as many of them as it holds: what `fileDataForUUID` gives.
+    /// Returns a source for `length` bytes of a file, beginning at `offset`, or for fewer if the file ends before. This
+    /// is the place that `fileDataForUUID` returns.
     static StreamSource part(const FileLocation& file, std::uint64_t offset, std::uint64_t length);
 
     /// Bytes of the caller, such as `loadAllData` gives, which must outlive the source. `name` is for messages.
