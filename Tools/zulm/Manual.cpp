@@ -59,23 +59,15 @@ std::vector<std::string> linesOf(const std::string& text) {
 
 const char* const s_aboutOutput =
     "Results are printed to standard output, and everything else to standard error. With --json, a command that "
-<<<<<<< ours
-    "reports "
-    "something prints one JSON document: {\"schema\": \"zulm.COMMAND\", \"schema_version\": 1, \"tool_version\": ..., "
-    "\"files\": [...], \"errors\": [...]}. The document is complete even if no file could be read: its errors name "
-    "every file that could not be read and everything that was not found. A time is given in seconds (90, 12.5) or as "
-    "a "
-    "time code (1:30, 0:01:02.5). If a command reads a file, the name - stands for standard input. Files that a "
-    "command "
-    "writes appear whole or not at all. An existing file is replaced only with --force.";
-=======
     "reports something prints one JSON document: {\"schema\": \"zulm.COMMAND\", \"schema_version\": 1, "
-    "\"tool_version\": ..., \"files\": [...]}. A file that could not be read is not in it. If a command reads a file, "
-    "the name - stands for standard input. Files that a command writes appear whole or not at all. An existing file is "
-    "replaced only with --force. In texts and names of files, what cannot be seen is an escape: \\xNN for a control "
-    "character of ASCII and for a byte that is not UTF-8, \\u{N} for another character, two backslashes for one. JSON "
-    "has the texts themselves, and the bytes of one that is not UTF-8 beside it as KEY_base64.";
->>>>>>> theirs
+    "\"tool_version\": ..., \"files\": [...], \"errors\": [...]}. The document is complete even if no file could "
+    "be read: its errors name every file that could not be read and everything that was not found. A time is "
+    "given in seconds (90, 12.5) or as a time code (1:30, 0:01:02.5). If a command reads a file, the name - "
+    "stands for standard input. Files that a command writes appear whole or not at all. An existing file is "
+    "replaced only with --force, and nobody may read an output who may not read its inputs. In texts and names of "
+    "files, what cannot be seen is an escape: \\xNN for a control character of ASCII and for a byte that is not "
+    "UTF-8, \\u{N} for another character, two backslashes for one. JSON has the texts themselves, and the bytes "
+    "of one that is not UTF-8 beside it as KEY_base64.";
 
 const std::vector<ExitCodeMeaning>& exitCodeMeanings() {
     static const std::vector<ExitCodeMeaning> meanings{
