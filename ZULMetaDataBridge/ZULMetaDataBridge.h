@@ -56,6 +56,7 @@
 #include "Source/MetaDataWriters/TopmostAppNameMetaDataWriter.h"
 #include "Source/MetaDataWriters/TopmostWindowMetaDataWriter.h"
 #include "Source/MetaDataWriters/TopmostWindowTitleMetaDataWriter.h"
+#include "Source/RecordingRedaction.h"
 #include "Source/SafeMovieSave.h"
 #include "Source/StreamRedaction.h"
 #include "Source/StreamRetiming.h"

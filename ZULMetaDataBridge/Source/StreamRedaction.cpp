@@ -2,7 +2,7 @@
 
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
-#include "ZULMetaDataBridge/Source/RemovedTimes.h"
+#include "ZULMetaDataBridge/Source/Redaction/RemovedTimes.h"
 
 #include <cmath>
 #include <limits>
@@ -37,7 +37,7 @@ bool isSecret(const std::string& text) {
 /// Finds the texts that were in force inside a removed range.
 class HeldTexts {
 public:
-    HeldTexts(const RemovedTimes& times, std::set<std::string>& texts) : times_(times), texts_(texts) {}
+    HeldTexts(const detail::RemovedTimes& times, std::set<std::string>& texts) : times_(times), texts_(texts) {}
 
     void add(const TimedValue<std::string>& entry) {
         endAt(entry.time);
@@ -56,7 +56,7 @@ private:
         return times_.isRemoved(last_->time) || times_.meets(last_->time, end >= last_->time ? end : never);
     }
 
-    const RemovedTimes& times_;
+    const detail::RemovedTimes& times_;
     std::set<std::string>& texts_;
     std::optional<TimedValue<std::string>> last_;
 };
@@ -207,7 +207,7 @@ private:
     }
 
     const Redaction& redaction_;
-    RemovedTimes times_;
+    detail::RemovedTimes times_;
     const std::set<std::string>& heldTexts_;
     RemovedPictures pictures_;
     RedactedStream& result_;
@@ -272,7 +272,7 @@ std::set<std::string> textsHeldInside(const StreamSource::Bytes& stream, const R
     std::set<std::string> texts;
     if (redaction.removedTimes.empty())
         return texts;
-    const RemovedTimes times(redaction.removedTimes);
+    const detail::RemovedTimes times(redaction.removedTimes);
     HeldTexts held(times, texts);
     StreamEntries entries = entriesOf(stream.read, stream.length);
     visitTexts(entries, [&]<class Value>(const TimedValue<Value>& decoded) {

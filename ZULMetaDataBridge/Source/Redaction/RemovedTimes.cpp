@@ -1,9 +1,9 @@
-#include "ZULMetaDataBridge/Source/RemovedTimes.h"
+#include "ZULMetaDataBridge/Source/Redaction/RemovedTimes.h"
 
 #include <algorithm>
 #include <cmath>
 
-namespace ZULMetaData {
+namespace ZULMetaData::detail {
 
 RemovedTimes::RemovedTimes(std::vector<TimeRange> ranges) {
     std::erase_if(ranges, [](const TimeRange& range) { return !(range.from <= range.to); });
@@ -31,4 +31,4 @@ bool RemovedTimes::meets(double begin, double end) const {
                        [=](const auto& range) { return begin <= range.to && range.from < end; });
 }
 
-} // namespace ZULMetaData
+} // namespace ZULMetaData::detail

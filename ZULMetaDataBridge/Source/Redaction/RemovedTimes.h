@@ -6,7 +6,7 @@
 
 #include <vector>
 
-namespace ZULMetaData {
+namespace ZULMetaData::detail {
 
 class RemovedTimes {
 public:
@@ -25,4 +25,4 @@ private:
     std::vector<TimeRange> ranges_;
 };
 
-} // namespace ZULMetaData
+} // namespace ZULMetaData::detail

@@ -1,0 +1,60 @@
+#pragma once
+
+// Numbers and texts in the parts of a container that are read whole.
+
+#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/StreamExtent.h"
+#include "ZULMetaDataBridge/Source/Redaction/MediaPlaces.h"
+
+#include <algorithm>
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace ZULMetaData::detail {
+
+constexpr int s_deepestLevel = 16;               ///< of atoms or lists inside each other
+constexpr std::uint64_t s_longestRead = 1 << 20; ///< bytes of an atom or chunk that is read as text
+
+template <std::size_t size>
+bool isOneOf(std::string_view type, const std::array<std::string_view, size>& types) {
+    return std::find(types.begin(), types.end(), type) != types.end();
+}
+
+/// Returns whether all bytes are zero; there must be at least one.
+bool isZero(std::string_view bytes);
+
+/// Returns fewer bytes at the end of the input, and at most `limit`.
+std::string readBytes(const ReadBytes& read, std::uint64_t offset, std::uint64_t size, std::uint64_t limit);
+
+/// Returns 0 if the bytes do not reach that far.
+///@{
+std::uint64_t bigEndianAt(std::string_view bytes, std::size_t offset, std::size_t size);
+std::uint32_t littleEndianAt(std::string_view bytes, std::size_t offset);
+///@}
+
+/// Returns the bytes from `offset` on, at most `size` of them.
+std::string_view part(std::string_view bytes, std::size_t offset, std::size_t size = std::string_view::npos);
+
+/// Returns UTF-8 for a stored text that is UTF-8, UTF-16 with a byte-order mark, or else Latin-1, up to its zero byte.
+std::string decodedText(std::string_view bytes);
+
+/// Returns the runs of at least four characters in bytes of an unknown layout.
+std::vector<std::string> textRuns(std::string_view bytes);
+
+/// Returns an item's type as it can be shown: its characters, or a number if they are none.
+std::string shownType(const ContainerItem& item);
+
+/// Returns the place that an item takes; an atom becomes `free`, a chunk `JUNK`, and every byte after its header zero.
+///@{
+MediaPlace blankedAtom(MediaPlace::Use use, const std::string& path, const ContainerItem& atom);
+MediaPlace blankedChunk(MediaPlace::Use use, const std::string& path, const ContainerItem& chunk);
+///@}
+
+/// Returns whether every byte after an item's header is zero already.
+bool isBlank(const ReadBytes& read, const ContainerItem& item);
+
+} // namespace ZULMetaData::detail

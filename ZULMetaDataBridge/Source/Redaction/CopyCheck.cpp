@@ -1,0 +1,163 @@
+#include "ZULMetaDataBridge/Source/Redaction/CopyCheck.h"
+
+#include "ZULMetaData/RecordingInfo.h"
+#include "ZULMetaDataBridge/Source/KindEntries.h"
+#include "ZULMetaDataBridge/Source/Redaction/NullOutput.h"
+
+#include <algorithm>
+#include <cstring>
+
+namespace ZULMetaData::detail {
+
+namespace {
+
+using Reason = RedactionError::Reason;
+
+std::string placeText(const std::string& path, std::uint64_t offset) {
+    return path + " at offset " + std::to_string(offset);
+}
+
+[[noreturn]] void failFor(const std::string& what, const std::string& path, std::uint64_t offset) {
+    throw RedactionError(Reason::FoundInCopy, "the copy still holds " + what + ", in " + placeText(path, offset));
+}
+
+std::set<std::string> allOf(const RedactedTexts& texts) {
+    std::set<std::string> all = texts.hidden;
+    all.insert(texts.removed.begin(), texts.removed.end());
+    return all;
+}
+
+/// An entry that stands for what was removed may be inside a removed range.
+bool isPlaceholder(const RedactedEntry& entry) {
+    if (entry.action != RedactedEntry::Removed || entrySizeOf(entry.header) != 0)
+        return entry.action == RedactedEntry::Added;
+    const auto decoded = decodeEntry<std::string>(entry.original, entry.header.version);
+    return decoded && decoded->value == s_hiddenText;
+}
+
+} // namespace
+
+std::vector<StreamPart> streamsIn(MetaDataParser& recording) {
+    const ReadBytes read = readingFrom(recording.getStream());
+    const std::uint64_t total = sizeOfInput(recording.getStream());
+    std::vector<StreamPart> streams;
+    for (const uuid& type : recording.getAvailableMetaDataUUIDs()) {
+        const auto [offset, length] = recording.fileDataForUUID(type);
+        const std::uint64_t begin = std::min(offset, total);
+        const std::uint64_t present = std::min(length, total - begin);
+        const auto readStream = [read, begin, present](std::uint64_t position, std::span<char> bytes) {
+            const std::uint64_t left = present - std::min(position, present);
+            return read(begin + position,
+                        bytes.first(static_cast<std::size_t>(std::min<std::uint64_t>(bytes.size(), left))));
+        };
+        streams.push_back({type, offset, length, {present, readStream}});
+    }
+    return streams;
+}
+
+MediaPlaces placesIn(MetaDataParser& recording) {
+    switch (recording.getStreamType()) {
+    case MetaDataParser::QuickTime: return findPlacesInMovie(recording.getStream());
+    case MetaDataParser::Riff: return findPlacesInRIFF(recording.getStream());
+    default: return {};
+    }
+}
+
+// Readers tell platforms apart by the name, and it is the same in every movie that is recorded.
+ZCAPHeader neutralRecordingInfo() {
+    ZCAPHeader info;
+    info.headerVersion = 1;
+    info.creator.setName(CreatorAttributes::platformNameMac());
+    return info;
+}
+
+CopyCheck::CopyCheck(const RecordingRedaction& redaction, const Redaction& streams, const RedactedTexts& texts)
+    : redaction_(redaction), streams_(streams), hidden_(texts.hidden, redaction.spellings),
+      gone_(allOf(texts), redaction.spellings) {}
+
+bool CopyCheck::tells(const MediaText& place) const {
+    return std::any_of(place.texts.begin(), place.texts.end(), [&](const std::string& text) {
+        if (place.role == MediaText::Role::Technical)
+            return gone_.isIn(text);
+        const bool isTitle = place.role == MediaText::Role::Title;
+        return gone_.isToldBy(text) || (isTitle && redaction_.streams.hidesText && redaction_.streams.hidesText(text));
+    });
+}
+
+void CopyCheck::requireNoTextStays(const MediaPlaces& media) const {
+    if (!hasTexts() && !redaction_.removesChapters)
+        return;
+    if (!media.obstacles.empty()) {
+        const MediaObstacle& first = media.obstacles.front();
+        throw RedactionError(Reason::TextCannotGo, placeText(first.path, first.offset) + ' ' + first.reason);
+    }
+    std::vector<const MediaText*> telling;
+    for (const MediaText& place : media.texts)
+        if ((!redaction_.removesChapters || place.role == MediaText::Role::Caption) && tells(place))
+            telling.push_back(&place);
+    if (telling.empty())
+        return;
+    const bool hasCaption = std::any_of(telling.begin(), telling.end(),
+                                        [](const auto* place) { return place->role == MediaText::Role::Caption; });
+    std::string places = placeText(telling.front()->path, telling.front()->offset);
+    for (std::size_t i = 1; i < telling.size(); ++i)
+        places += (i + 1 < telling.size() ? ", " : " and ") + placeText(telling[i]->path, telling[i]->offset);
+    throw RedactionError(hasCaption ? Reason::TextCannotGo : Reason::TextStays,
+                         "texts that are to go are in the movie too: " + places);
+}
+
+void CopyCheck::requireClean(std::istream& copy, MetaDataParser::StreamType type,
+                             const std::function<void(std::uint64_t)>& advance) const {
+    const auto parser = MetaDataParser::create(copy, type);
+    if (!parser)
+        throw RedactionError(Reason::CannotWrite, "the copy cannot be read back");
+    for (const StreamPart& stream : streamsIn(*parser))
+        requireCleanStream(stream);
+    if (type == MetaDataParser::RawStream)
+        return;
+    if (hasTexts())
+        requireCleanTexts(placesIn(*parser));
+    requireCleanBytes(*parser, advance);
+    if (redaction_.removesCreator)
+        requireNeutralInfo(*parser);
+}
+
+/// A redaction that is applied once more must find nothing to do.
+void CopyCheck::requireCleanStream(const StreamPart& stream) const {
+    NullOutput nowhere;
+    Redaction again = streams_;
+    const std::string name = metaDataKindName(stream.type);
+    again.onEntry = [&](const RedactedEntry& entry) {
+        if (!isPlaceholder(entry))
+            failFor("an entry that was to go", name, stream.offset);
+    };
+    if (redactStream(stream.bytes, again, nowhere).removal != RedactedStream::Kept)
+        failFor("a stream that was to go", name, stream.offset);
+}
+
+void CopyCheck::requireCleanTexts(const MediaPlaces& media) const {
+    for (const MediaText& place : media.texts)
+        if (tells(place))
+            failFor("a text that was to go", place.path, place.offset);
+}
+
+/// Streams that stay may contain the texts of kinds that are left out.
+void CopyCheck::requireCleanBytes(MetaDataParser& copy, const std::function<void(std::uint64_t)>& advance) const {
+    const ReadBytes read = readingFrom(copy.getStream());
+    const std::vector<ContainerItem> items = listTopLevel(copy.getStream(), copy.getStreamType());
+    requireReadable(copy.getStream());
+    for (const ContainerItem& item : items) {
+        const TextSearch& search = item.holdsMetaData() ? hidden_ : gone_;
+        if (const auto found = search.findIn(read, item.offset, item.end(), advance))
+            failFor("a text that was to go", item.type, *found);
+    }
+}
+
+void CopyCheck::requireNeutralInfo(MetaDataParser& copy) const {
+    const ZCAPHeader neutral = neutralRecordingInfo();
+    for (const ZCAPHeader& info : readRecordingInfo(copy))
+        if (std::memcmp(&info, &neutral, sizeof info) != 0)
+            throw RedactionError(Reason::FoundInCopy, "the copy still says who made the recording");
+}
+
+} // namespace ZULMetaData::detail
