@@ -257,6 +257,112 @@ TEST_F(RedactCommand, RefusesWhatItCannotMean) {
     EXPECT_EQ(std::distance(std::filesystem::directory_iterator(folder.path()), {}), 1) << "nothing is left behind";
 }
 
+/// A movie of two seconds with two chapters, a title, a comment and a named track, and with metadata.
+class RedactRealMovie : public RedactCommand {
+protected:
+    void SetUp() override {
+        const std::string tags = write("tags.txt", ";FFMETADATA1\ntitle=Salary Movie\ncomment=by Bob\n"
+                                                   "[CHAPTER]\nTIMEBASE=1/1000\nSTART=0\nEND=1000\ntitle=Salary List\n"
+                                                   "[CHAPTER]\nTIMEBASE=1/1000\nSTART=1000\nEND=2000\ntitle=Mail\n");
+        for (const std::string name : {"real.mp4", "real.mov", "real.avi"}) {
+            outputOf("ffmpeg -v error -y -f lavfi -i testsrc=size=64x48:rate=10:duration=2 -f lavfi -i sine=duration=2 "
+                     "-i " +
+                     tags + " -map_metadata 2 -metadata:s:v handler_name='Salary Track' -c:v mpeg4 -c:a pcm_s16le " +
+                     (name == "real.mp4" ? "-c:a aac " : "") + (folder / name));
+        }
+        const std::string titles = streamHeader("2b7b6a07", 1, 0) + textEntry(0, "Mail") + textEntry(1, "Salary List");
+        for (const std::string name : {"real.mp4", "real.mov"})
+            write(name, contentsOf(folder / name) + zulmAtom({titles}));
+        write("real.avi", contentsOf(folder / "real.avi") + zulmChunk({titles}));
+    }
+
+    static std::string packetsOf(const std::string& file) {
+        return outputOf("ffmpeg -v error -i " + file + " -map 0:v -map 0:a -c copy -f streamhash -");
+    }
+
+    static std::string picturesOf(const std::string& file) {
+        return outputOf("ffmpeg -v error -i " + file + " -map 0:v -map 0:a -f framemd5 -");
+    }
+};
+
+TEST_F(RedactRealMovie, RefusesWhatItsChaptersAndTagsTell) {
+    for (const std::string name : {"real.mp4", "real.mov", "real.avi"}) {
+        const std::string output = folder / ("out" + name);
+        const ToolResult result = runTool({"redact", folder / name, "-o", output, "--titles", "Salary"});
+        EXPECT_EQ(result.exitCode, 1) << name;
+        EXPECT_THAT(result.errors, HasSubstr("texts that are to go are in the movie too: "));
+        EXPECT_THAT(result.errors, HasSubstr("add --chapters"));
+        EXPECT_FALSE(std::filesystem::exists(output));
+        EXPECT_EQ(runTool({"redact", folder / name, "-o", output, "--stream", "topmostWindowTitle"}).exitCode,
+                  name == "real.avi" ? 0 : 1)
+            << "an AVI file has no chapters";
+    }
+}
+
+TEST_F(RedactRealMovie, RemovesChaptersAndTagsAndStillPlays) {
+    for (const std::string name : {"real.mp4", "real.mov", "real.avi"}) {
+        const std::string copy = redacted(folder / name, {"--titles", "Salary", "--chapters"});
+        for (const char* secret : {"Salary", "by Bob"})
+            EXPECT_THAT(copy, Not(HasSubstr(secret))) << name;
+        const std::string output = folder / ("out" + std::filesystem::path(name).extension().string());
+        const std::string shown = outputOf("ffprobe -v error -show_chapters -show_format -show_streams " + output);
+        EXPECT_THAT(shown, Not(HasSubstr("CHAPTER")));
+        EXPECT_THAT(shown, Not(HasSubstr("title")));
+        EXPECT_THAT(shown, Not(HasSubstr("codec_type=data")));
+        EXPECT_THAT(outputOf("exiftool -s " + output), Not(HasSubstr("Salary")));
+        EXPECT_EQ(packetsOf(output), packetsOf(folder / name));
+        EXPECT_EQ(picturesOf(output), picturesOf(folder / name));
+    }
+}
+
+TEST_F(RedactCommand, RemovesTheCreator) {
+    const std::string file =
+        write("movie.mp4", media() + recordingInfo("Mac", "4.2.17", "10.15.7") + zulmAtom({keyStream()}));
+    EXPECT_EQ(redacted(file, {"--creator"}), media() + recordingInfo("Mac", "", "") + zulmAtom({keyStream()}));
+}
+
+TEST_F(RedactCommand, BlanksUnknownAtoms) {
+    const std::string file = write("movie.mp4", media() + atom("abcd", "secret") + zulmAtom({keyStream()}));
+    EXPECT_EQ(redacted(file, {"--keys"}), media() + atom("abcd", "secret") + zulmAtom({clearedKeyStream()}));
+    EXPECT_EQ(redacted(file, {"--blank-unknown"}),
+              media() + atom("free", std::string(6, '\0')) + zulmAtom({keyStream()}));
+}
+
+TEST_F(RedactCommand, WritesNothingIfTheCopyHoldsWhatWasToGo) {
+    const std::string names = streamHeader(s_appNames, 1, 0) + textEntry(1, "Salary of March");
+    const std::string file = write("movie.mp4", atom("mdat", "xx"
+                                                             "Salary of March") +
+                                                    zulmAtom({names}));
+    const ToolResult result = runTool({"redact", file, "-o", folder / "out.mp4", "--titles", "Salary"});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("the copy still holds a text that was to go, in mdat at offset 10"));
+    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(folder.path()), {}), 1) << "nothing is left behind";
+}
+
+TEST_F(RedactCommand, ListsWhatWouldGo) {
+    const std::string file = write("movie.mp4", media() + recordingInfo("Mac", "4.2", "1.2") +
+                                                    zulmAtom({keyStream(), appNameStream(), locationStream()}));
+    const std::vector<std::string> options{"redact", file,       "--dry-run",      "--range",
+                                           "1:1.5",  "--stream", "keyboardAction", "--creator"};
+    const ToolResult result = runTool(options);
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_THAT(result.output, HasSubstr("topmostAppName           changed      0.500000  name=\"Abc\"\n"));
+    EXPECT_THAT(result.output, HasSubstr("cursorLocation           removed      1.000000  x=-3  y=7\n"));
+    EXPECT_THAT(result.output, HasSubstr("cursorLocation           added      1.500000\n"));
+    EXPECT_THAT(result.output, HasSubstr("keyboardAction           removed      2.000000  characterCode="));
+    EXPECT_THAT(result.output, HasSubstr("ZULR                     removed: 80 bytes at offset 30 (creator)\n"));
+    std::vector<std::string> asJSON = options;
+    asJSON.emplace_back("--json");
+    const Json document = Json::parse(runTool(asJSON).output)["files"][0];
+    EXPECT_EQ(document["dry_run"], true);
+    EXPECT_EQ(document["entries"].size(), 5U);
+    EXPECT_EQ(document["entries"][0]["stream"], "topmostAppName");
+    EXPECT_EQ(document["entries"][0]["action"], "changed");
+    EXPECT_EQ(document["places"][0]["reason"], "creator");
+    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(folder.path()), {}), 1) << "nothing is written";
+    EXPECT_EQ(runTool({"redact", file, "--keys"}).exitCode, 2) << "neither --output nor --dry-run";
+}
+
 TEST_F(RedactCommand, ReportsAsJSON) {
     const std::string file = write("movie.mp4", media() + zulmAtom({keyStream(), appNameStream()}));
     const ToolResult result =

@@ -145,9 +145,11 @@ TEST_F(Schema, HoldsForExtractAndSalvage) {
 }
 
 TEST_F(Schema, HoldsForRedact) {
-    expectValid({outputOf({"redact", movie(), "-o", folder / "public.mp4", "--keys", "--titles", "README", "--range",
-                           "1:2", "--stream", "systemData"}),
-                 outputOf({"redact", torn(), "-o", folder / "public.dat", "--range", "1:"})});
+    expectValid(
+        {outputOf({"redact", movie(), "-o", folder / "public.mp4", "--keys", "--titles", "README", "--range", "1:2",
+                   "--stream", "systemData"}),
+         outputOf({"redact", torn(), "-o", folder / "public.dat", "--range", "1:"}),
+         outputOf({"redact", movie(), "--dry-run", "--keys", "--range", "1:2", "--creator", "--stream", "cpuUsage"})});
 }
 
 TEST_F(Schema, HoldsIfNothingCanBeReadOrFound) {

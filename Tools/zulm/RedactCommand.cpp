@@ -1,11 +1,13 @@
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/NormalForm.h"
 #include "Tools/zulm/OutputFile.h"
-#include "Tools/zulm/RedactedCopy.h"
+#include "Tools/zulm/Progress.h"
+#include "Tools/zulm/RedactReport.h"
 #include "Tools/zulm/RunReport.h"
+#include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/Settings.h"
-#include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
 #include "Tools/zulm/TextPattern.h"
 
@@ -19,7 +21,6 @@
 namespace Zulm {
 
 using namespace ZULMetaData;
-using Json = nlohmann::ordered_json;
 
 namespace {
 
@@ -31,6 +32,10 @@ struct RedactOptions {
     bool keys = false;
     std::vector<std::string> titles;
     std::vector<TimeRange> ranges;
+    bool chapters = false;
+    bool creator = false;
+    bool blankUnknown = false;
+    bool dryRun = false;
     bool force = false;
     bool json = false;
 };
@@ -41,14 +46,17 @@ double secondsIn(const std::string& text, double open) {
     return requireSeconds("--range", text, Sign::Any);
 }
 
-/// "10:20", ":20", "10:", and the same with "..", which lets both ends be time codes.
+/// "10:20", ":20", "10:", and the same with "..", which lets both ends be time codes. With a colon between them, time
+/// codes could be read in two ways.
 TimeRange rangeIn(const std::string& text) {
     constexpr double endless = std::numeric_limits<double>::infinity();
     const std::size_t dots = text.find("..");
     const std::size_t middle = dots == std::string::npos ? text.find(':') : dots;
     const std::size_t width = dots == std::string::npos ? 1 : 2;
-    if (middle == std::string::npos || text.size() == width)
-        throw CLI::ValidationError(fmt::format("--range: {} is not of the form A:B, A: or :B, or A..B", text));
+    const bool isAmbiguous = dots == std::string::npos && std::count(text.begin(), text.end(), ':') > 1;
+    if (middle == std::string::npos || text.size() == width || isAmbiguous)
+        throw CLI::ValidationError(
+            fmt::format("--range: {} is not of the form A:B, A: or :B, nor A..B, which time codes need", text));
     const TimeRange range{secondsIn(text.substr(0, middle), -endless), secondsIn(text.substr(middle + width), endless)};
     if (range.from > range.to)
         throw CLI::ValidationError(fmt::format("--range: {} ends before it begins", text));
@@ -62,30 +70,30 @@ std::vector<TextPattern> patternsIn(const RedactOptions& options) {
     return patterns;
 }
 
-Redaction redactionFor(const RedactOptions& options) {
-    Redaction redaction;
-    for (const std::string& kind : options.removedKinds)
-        redaction.removedKinds.insert(typeNamed(kind));
-    for (const std::string& kind : options.keptKinds)
-        redaction.keptKinds.insert(typeNamed(kind));
-    redaction.clearsKeys = options.keys;
-    redaction.removedTimes = options.ranges;
+std::set<uuid> typesNamed(const std::vector<std::string>& kinds) {
+    std::set<uuid> types;
+    for (const std::string& kind : kinds)
+        types.insert(typeNamed(kind));
+    return types;
+}
+
+RecordingRedaction redactionFor(const RedactOptions& options) {
+    RecordingRedaction redaction;
+    redaction.streams.removedKinds = typesNamed(options.removedKinds);
+    redaction.streams.keptKinds = typesNamed(options.keptKinds);
+    redaction.streams.clearsKeys = options.keys;
+    redaction.streams.removedTimes = options.ranges;
     if (!options.titles.empty())
-        redaction.hidesText =
+        redaction.streams.hidesText =
             [patterns = std::make_shared<std::vector<TextPattern>>(patternsIn(options))](const std::string& text) {
                 return std::any_of(patterns->begin(), patterns->end(),
                                    [valid = validText(text)](const auto& pattern) { return pattern.matches(valid); });
             };
+    redaction.removesChapters = options.chapters;
+    redaction.removesCreator = options.creator;
+    redaction.blanksUnknown = options.blankUnknown;
+    redaction.spellings = [](const std::string& text) { return std::vector{composed(text), decomposed(text)}; };
     return redaction;
-}
-
-const char* removalText(RedactedStream::Removal removal) {
-    switch (removal) {
-    case RedactedStream::Kept: return "kept";
-    case RedactedStream::Asked: return "removed";
-    case RedactedStream::Undecodable: return "removed: its entries cannot be looked into";
-    default: return "removed: it has no whole header";
-    }
 }
 
 bool isLoss(const RedactedStream& stream) {
@@ -93,9 +101,9 @@ bool isLoss(const RedactedStream& stream) {
            (stream.removal != RedactedStream::Kept && stream.removal != RedactedStream::Asked);
 }
 
-ExitCode complainAboutWhatIsLeftOut(const std::string& name, const RedactedCopy& copy) {
+ExitCode complainAboutWhatIsLeftOut(const std::string& name, const RedactedRecording& recording) {
     ExitCode code = ExitFine;
-    for (const RedactedStream& stream : copy.streams()) {
+    for (const RedactedStream& stream : recording.streams) {
         if (!isLoss(stream))
             continue;
         code = ExitDamaged;
@@ -106,10 +114,10 @@ ExitCode complainAboutWhatIsLeftOut(const std::string& name, const RedactedCopy&
             complain(
                 fmt::format("{}: {}: {}", name, metaDataKindName(stream.header.uuid), removalText(stream.removal)));
     }
-    if (copy.unreachableStreams() == 0)
+    if (recording.unreachableStreams == 0)
         return code;
     complain(fmt::format("{}: left out {} streams that readers do not find; 'zulm salvage {} -o DIR' writes them out",
-                         name, copy.unreachableStreams(), shellWord(name)));
+                         name, recording.unreachableStreams, shellWord(name)));
     return ExitDamaged;
 }
 
@@ -122,62 +130,129 @@ ExitCode complainAboutDamage(const std::string& path, const std::string& output)
     return ExitDamaged;
 }
 
-Json streamDocument(const RedactedStream& stream) {
-    return {{"kind", kindDocument(stream.header.uuid)},
-            {"uuid", uuidText(stream.header.uuid)},
-            {"removed", stream.removal != RedactedStream::Kept},
-            {"status", removalText(stream.removal)},
-            {"entries", stream.entries},
-            {"entries_changed", stream.entriesChanged},
-            {"entries_removed", stream.entriesRemoved},
-            {"entries_added", stream.entriesAdded},
-            {"bytes_left_out", stream.bytesLeftOut}};
-}
-
-Json fileDocument(const RedactOptions& options, const RedactedCopy& copy) {
-    Json document = fileHeader(options.file);
-    addText(document, "output", options.output);
-    document["streams"] = Json::array();
-    for (const RedactedStream& stream : copy.streams())
-        document["streams"].push_back(streamDocument(stream));
-    document["unreachable_streams"] = copy.unreachableStreams();
-    return document;
-}
-
-void print(const RedactOptions& options, const RedactedCopy& copy) {
-    writeOutput(fmt::format("{}: written\n", options.output));
-    for (const RedactedStream& stream : copy.streams()) {
-        const std::string name = metaDataKindName(stream.header.uuid);
-        if (stream.removal != RedactedStream::Kept)
-            writeOutput(fmt::format("  {:<23}  {}\n", name, removalText(stream.removal)));
-        else
-            writeOutput(fmt::format("  {:<23}  {} left, {} of them changed; {} removed\n", name, stream.entries,
-                                    stream.entriesChanged, stream.entriesRemoved));
+/// What a person can do about it.
+std::string hintFor(RedactionError::Reason reason, const std::string& name) {
+    using Reason = RedactionError::Reason;
+    switch (reason) {
+    case Reason::Repairable: return fmt::format("; run 'zulm repair {} -o OUT' first", shellWord(name));
+    case Reason::Damaged:
+        return fmt::format("; 'zulm salvage {} -o DIR' writes out its streams, which can be redacted one by one",
+                           shellWord(name));
+    case Reason::MisplacedStream:
+        return fmt::format(
+            "; --blank-unknown removes it from free space, and 'zulm salvage {} -o DIR' shows what it is",
+            shellWord(name));
+    case Reason::TextStays: return "; add --chapters, which removes chapters, titles and tags of the movie";
+    case Reason::TextCannotGo: return "; zulm cannot remove texts from there: remove that track with another program";
+    case Reason::FoundInCopy: return "; nothing was written";
+    default: return {};
     }
 }
 
-ExitCode redact(const RedactOptions& options, RunReport& report) {
-    const InputFile input(options.file);
-    Recording recording(input.path(), input.name());
-    requireOutputName(options.output, recording.parser().getStreamType(), input.path());
-    if (heldStreams(recording).empty())
-        return complainAboutNothing(recording, {});
-    const Redaction redaction = redactionFor(options);
-    OutputFile output(options.output, {input.name()}, options.force);
-    RedactedCopy copy(recording, redaction);
-    copy.write(output.temporaryPath(), options.output);
-    const bool isEmptyStream = recording.parser().getStreamType() == MetaDataParser::RawStream &&
-                               copy.streams().front().removal != RedactedStream::Kept;
-    if (isEmptyStream)
-        throw Failure(fmt::format("{}: nothing would be left of it ({}); nothing was written", input.name(),
-                                  removalText(copy.streams().front().removal)));
-    const ExitCode damage = complainAboutDamage(output.temporaryPath(), options.output);
-    output.commit();
+/// Throws `Failure` in place of what the library throws, and names the file that is concerned.
+template <class Work>
+auto orFailure(const RedactOptions& options, const std::string& name, Work work) {
+    using Reason = RedactionError::Reason;
+    try {
+        return orUnreadable(name, work);
+    } catch (const RedactionError& error) {
+        const bool isAboutCopy = error.reason() == Reason::CannotWrite || error.reason() == Reason::FoundInCopy;
+        throw Failure(
+            fmt::format("{}: {}{}", isAboutCopy ? options.output : name, error.what(), hintFor(error.reason(), name)));
+    }
+}
+
+/// One line of progress for each step.
+RecordingRedactor::Progress progressOf(const RedactOptions& options, const std::string& name) {
+    using Step = RecordingRedactor::Step;
+    struct Shown {
+        Step step;
+        Progress progress;
+    };
+    return
+        [options, name, shown = std::shared_ptr<Shown>()](Step step, std::uint64_t done, std::uint64_t total) mutable {
+            if (!shown || shown->step != step) {
+                shown.reset(); // ends the line of the step before
+                const std::string what = step == Step::Searching ? "searching " + name
+                                         : step == Step::Copying ? "copying " + name
+                                                                 : "checking " + options.output;
+                shown.reset(new Shown{step, {what, total}});
+            }
+            shown->progress.moveTo(done);
+        };
+}
+
+/// The list of a dry run is a result, which --quiet does not hide.
+void tell(const RedactOptions& options, const RedactReport& redaction, const VisitEntries& visitEntries,
+          RunReport& report) {
     if (report.isWanted())
-        report.add(fileDocument(options, copy));
-    else if (!settings().quiet)
-        print(options, copy);
-    return worseOf(damage, complainAboutWhatIsLeftOut(input.name(), copy));
+        writeRedaction(report.writer(), redaction, visitEntries);
+    else if (options.dryRun || !settings().quiet)
+        printRedaction(redaction, visitEntries);
+}
+
+ExitCode preview(const RedactOptions& options, Recording& recording, RunReport& report) {
+    const std::string& name = recording.name();
+    RecordingRedaction redaction = redactionFor(options);
+    std::function<void(const RedactedEntry&)> visit;
+    redaction.streams.onEntry = [&visit](const RedactedEntry& entry) {
+        if (visit)
+            visit(entry);
+    };
+    return orFailure(options, name, [&] {
+        std::istream& input = recording.parser().getStream();
+        RecordingRedactor redactor(input, recording.parser().getStreamType(), redaction, progressOf(options, name));
+        if (redactor.isEmpty())
+            return complainAboutNothing(recording, {});
+        const RedactedRecording result = redactor.preview();
+        const auto visitEntries = [&](const auto& visitEntry) {
+            visit = visitEntry;
+            redactor.preview();
+        };
+        tell(options, {options.file, {}, result}, visitEntries, report);
+        return complainAboutWhatIsLeftOut(name, result);
+    });
+}
+
+ExitCode write(const RedactOptions& options, Recording& recording, RunReport& report) {
+    const std::string& name = recording.name();
+    return orFailure(options, name, [&] {
+        std::istream& input = recording.parser().getStream();
+        RecordingRedactor redactor(input, recording.parser().getStreamType(), redactionFor(options),
+                                   progressOf(options, name));
+        if (redactor.isEmpty())
+            return complainAboutNothing(recording, {});
+        OutputFile output(options.output, {name}, options.force);
+        const RedactedRecording result = redactor.write(output.temporaryPath());
+        const ExitCode damage = complainAboutDamage(output.temporaryPath(), options.output);
+        output.commit();
+        tell(options, {options.file, options.output, result}, {}, report);
+        return worseOf(damage, complainAboutWhatIsLeftOut(name, result));
+    });
+}
+
+ExitCode runRedact(const RedactOptions& options) {
+    return withReport("redact", options.json, {options.file}, [&](RunReport& report) {
+        const InputFile input(options.file);
+        Recording recording(input.path(), input.name());
+        if (options.dryRun)
+            return preview(options, recording, report);
+        requireOutputName(options.output, recording.parser().getStreamType(), input.path());
+        return write(options, recording, report);
+    });
+}
+
+bool removesNothing(const RedactOptions& options) {
+    return options.removedKinds.empty() && options.keptKinds.empty() && !options.keys && options.titles.empty() &&
+           options.ranges.empty() && !options.chapters && !options.creator && !options.blankUnknown;
+}
+
+void addPlaceOptions(CLI::App& command, RedactOptions& options) {
+    command.add_flag("--chapters", options.chapters,
+                     "Remove chapters, titles, tags and names of tracks from the movie itself. Captions stay");
+    command.add_flag("--creator", options.creator, "Remove the versions of program and system from the recording info");
+    command.add_flag("--blank-unknown", options.blankUnknown,
+                     "Fill free space, and atoms or chunks of unknown types, with zeros");
 }
 
 ExitCode runRedact(const RedactOptions& options) {
@@ -190,12 +265,10 @@ ExitCode runRedact(const RedactOptions& options) {
 void addRedactCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<RedactOptions>();
     CLI::App* command = app.add_subcommand(
-        "redact", "Copy a recording without what nobody else should see. What is removed is nowhere in the copy's "
-                  "metadata; pictures and sound are copied as they are");
+        "redact", "Copy a recording without what nobody else should see. The copy is read back, and does not appear if "
+                  "anything that was to go is found in it. Pictures and sound are copied as they are");
     command->add_option("FILE", options->file, "A movie, RIFF file or stream file; - is standard input")->required();
-    command->add_option("-o,--output", options->output, "The copy, of the same container")
-        ->type_name("OUT")
-        ->required();
+    command->add_option("-o,--output", options->output, "The copy, of the same container")->type_name("OUT");
     addStreamOption(*command, options->removedKinds, "Remove this kind, such as cpuUsage, or UUID (repeatable)");
     addStreamOption(*command, options->keptKinds, "Remove all kinds except this one (repeatable)", "--keep-only");
     command->add_flag("--keys", options->keys,
@@ -203,7 +276,7 @@ void addRedactCommand(CLI::App& app, Action& chosen) {
     command
         ->add_option("--titles", options->titles,
                      "Make every title, slide text, comment and application name in which this (RE2) is found an "
-                     "ellipsis")
+                     "ellipsis (repeatable)")
         ->type_name("REGEX")
         ->allow_extra_args(false);
     command
@@ -213,18 +286,23 @@ void addRedactCommand(CLI::App& app, Action& chosen) {
                 for (const std::string& text : texts)
                     options->ranges.push_back(rangeIn(text));
             },
-            "Remove the entries of all streams from A to B seconds; A or B may be missing. A text that holds inside is "
-            "hidden wherever it is recorded (repeatable)")
+            "Remove the entries of all streams from A to B seconds; A or B may be missing, and A..B takes time codes. "
+            "A "
+            "text that holds inside is hidden wherever it is recorded (repeatable)")
         ->type_name("A:B")
         ->allow_extra_args(false);
-    command->add_flag("--force", options->force, "Replace OUT where it exists");
+    addPlaceOptions(*command, *options);
+    command->add_flag("--dry-run", options->dryRun, "Write nothing; list every entry and place that would go");
+    command->add_flag("--force", options->force, "Replace OUT if it exists");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm redact Recording.mp4 -o Public.mp4 --keys --titles '(?i)salary|secret'\n"
                     "zulm redact Recording.mp4 -o Public.mp4 --stream systemData --range 12.5:40 --range 60:");
     command->callback([options, &chosen] {
-        if (options->removedKinds.empty() && options->keptKinds.empty() && !options->keys && options->titles.empty() &&
-            options->ranges.empty())
-            throw CLI::RequiredError("at least one of --stream, --keep-only, --keys, --titles and --range");
+        if (removesNothing(*options))
+            throw CLI::RequiredError("at least one of --stream, --keep-only, --keys, --titles, --range, --chapters, "
+                                     "--creator and --blank-unknown");
+        if (options->output.empty() && !options->dryRun)
+            throw CLI::RequiredError("--output or --dry-run");
         patternsIn(*options);
         chosen = [options] { return runRedact(*options); };
     });
