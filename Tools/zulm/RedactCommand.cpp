@@ -255,11 +255,6 @@ void addPlaceOptions(CLI::App& command, RedactOptions& options) {
                      "Fill free space, and atoms or chunks of unknown types, with zeros");
 }
 
-ExitCode runRedact(const RedactOptions& options) {
-    return withReport("redact", options.json, {options.file, options.output},
-                      [&](RunReport& report) { return redact(options, report); });
-}
-
 } // namespace
 
 void addRedactCommand(CLI::App& app, Action& chosen) {
