@@ -4,6 +4,7 @@
 #include "Bindings/Python/FileError.h"
 #include "Bindings/Python/PythonTexts.h"
 #include "Bindings/Python/StreamWriter.h"
+#include "ZULMetaData/ContainerRecognition.h"
 #include "ZULMetaData/MovieDuration.h"
 #include "ZULMetaData/RecordingInfo.h"
 #include "ZULMetaDataBridge/Source/HumanReadableActions.h"

@@ -1,6 +1,5 @@
 // Writing a recording anew with less metadata: zulm compact and zulm detach.
 
-#include "Tests/Tools/OddFiles.h"
 #include "Tests/Tools/RecordedSession.h"
 #include "Tests/Tools/ToolRun.h"
 #include "Tests/ZULMetaData/ContainerBytes.h"
@@ -68,8 +67,8 @@ TEST_F(CompactCommand, ChangesAFileInPlace) {
 }
 
 TEST_F(CompactCommand, WorksOnRIFF) {
-    const std::string movie = file("Recording.avi", riffMedia() + zulmChunk({appNameStream(), locationStream()}) +
-                                                        zulmChunk({s_newer}));
+    const std::string movie =
+        file("Recording.avi", riffMedia() + zulmChunk({appNameStream(), locationStream()}) + zulmChunk({s_newer}));
     const std::string avi = folder / "Out.avi";
     ASSERT_EQ(runTool({"compact", movie, "-o", avi}).exitCode, 0);
     EXPECT_EQ(contentsOf(avi), riffMedia() + zulmChunk({s_newer, locationStream()}));

@@ -117,7 +117,7 @@ TEST(MetaDataValidator, ReadsVersionOneOfTheCursorImages) {
 TEST(MetaDataValidator, TakesAnImageOfNoBytesInVersionOneForWhole) {
     const std::string entry = le32(28) + f64(1) + le64(7) + le32(8) + le32(1) + le32(2);
     const ValidationReport report = validated(streamHeader(s_images, 1, 0) + entry, s_raw);
-    EXPECT_EQ(findingsOf(report), "");
+    EXPECT_EQ(findingsOf(report), "cursor-without-image@24"); // a notice
     EXPECT_EQ(report.wholeEntries, 1U);
 }
 
@@ -506,7 +506,7 @@ TEST(BelievedSize, IsFoundByValidationInAlmostNoMemory) {
 
 TEST(MetaDataValidator, ThrowsForWhatIsNoFileToRead) {
     TemporaryFolder folder;
-    writeFile(folder / "Movie.mkv", media());
+    writeFile(folder / "Movie.mkv", hex("1a45dfa3 9f 4286 81 01") + "B\x82\x88matroska");
     std::filesystem::create_directory(folder / "Folder.mp4");
     for (const char* name : {"Missing.mp4", "Movie.mkv", "Folder.mp4"})
         EXPECT_THROW(validateRecording(folder / name), std::runtime_error) << name;
@@ -543,7 +543,7 @@ TEST(MetaDataValidator, ThrowsForADeviceWithoutPositions) {
     EXPECT_THROW(validateRecording(stream, s_raw), std::runtime_error);
 }
 
-TEST(MetaDataValidator, TellsTheContainerByTheExtensionOfTheFile) {
+TEST(MetaDataValidator, TellsTheContainerByTheContentsOfTheFile) {
     TemporaryFolder folder;
     writeFile(folder / "a.MOV", media() + zulmAtom({locationStream()}));
     writeFile(folder / "b.wav", riffMedia() + zulmChunk({locationStream()}));
@@ -553,6 +553,8 @@ TEST(MetaDataValidator, TellsTheContainerByTheExtensionOfTheFile) {
     EXPECT_EQ(validateRecording(folder / "c.dat").container, s_raw);
     for (const char* name : {"a.MOV", "b.wav", "c.dat"})
         EXPECT_EQ(validateRecording(folder / name).wholeEntries, 2U) << name;
+    std::filesystem::rename(folder / "a.MOV", folder / "a.m4v");
+    EXPECT_EQ(validateRecording(folder / "a.m4v").container, s_movie);
 }
 
 } // namespace

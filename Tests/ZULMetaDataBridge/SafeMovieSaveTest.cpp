@@ -654,8 +654,7 @@ TEST_F(SafeSave, IsWhatItWasWhereverAMoveOfTheIndexFails) {
 }
 
 TEST_F(SafeSave, TakesMoviesByTheirContents) {
-    for (const std::string& bytes :
-         {riffMedia(), locationStream(), std::string(5000, '\0'), std::string("Hello, world")}) {
+    for (const std::string& bytes : {riffMedia(), locationStream(), std::string(5000, '\0')}) {
         writeFile(movie, bytes);
         EXPECT_THROW(SafeMovieSave(movie).plan(), SaveError);
         EXPECT_THROW(SafeMovieSave(movie).stamp("a", "1"), SaveError);

@@ -280,7 +280,7 @@ def headers():
     invalid("header-entry-size-of-text.dat", header(APP, 16) + text(0.5, b"Abc"), "texts have no fixed size",
             ("entry-size-mismatch", 20))
     invalid("header-entry-size-of-image.dat", header(IMAGE, 32, 2) + cursor(), "cursor images have no fixed size",
-            ("entry-size-mismatch", 20))
+            ("entry-size-mismatch", 20), ("cursor-without-image", 24))
     invalid("header-scale-as-double.dat", header(SCALE, 16) + seconds(0.0) + seconds(2.0),
             "the scale factor is an integer, not a 64-bit float", ("entry-size-mismatch", 20), ("torn-entry", 36))
     invalid("header-unknown-kind-without-time.dat", header(STRANGE, 7) + b"1234567",
@@ -305,7 +305,7 @@ def fixed_entries():
     invalid("time-infinite-of-text.dat", APPS + text(-INFINITY, b"x"), "a text's time is infinite",
             ("time-not-finite", 56))
     invalid("time-not-a-number-of-image.dat", header(IMAGE, 0, 2) + cursor() + cursor(time=NAN),
-            "a cursor image's time is not a number", ("time-not-finite", 56))
+            "a cursor image's time is not a number", ("time-not-finite", 56), ("cursor-without-image", 24))
     invalid("time-not-a-number-in-list.dat",
             header(SYSTEM, 0) + texts([text(0.0, b"a"), text(NAN, b"b"), text(0.0, b"c"), text(0.0, b"d")]),
             "the time of a list's second text is not a number", ("time-not-finite", 45))
@@ -393,11 +393,11 @@ def cursors():
             "a record states a size that is one byte too large",
             ("entry-beyond-end", 24))
     invalid("cursor-torn.dat", start + cursor() + cursor(picture)[:-4], "the last record lacks its flags",
-            ("entry-beyond-end", 56))
+            ("entry-beyond-end", 56), ("cursor-without-image", 24))
     invalid("cursor-torn-in-time.dat", start + cursor() + cursor()[:10], "the stream ends inside a record's time",
-            ("torn-entry", 56))
+            ("torn-entry", 56), ("cursor-without-image", 24))
     invalid("cursor-sizes-disagree.dat", start + cursor(data_size=9) + cursor(), "a record's two sizes differ by one",
-            ("cursor-sizes", 24))
+            ("cursor-sizes", 24), ("cursor-without-image", 56))
     invalid("cursor-data-size-4-gib.dat", start + cursor(data_size=0xFFFFFFFF), "the data part states a size of 4 GiB",
             ("cursor-sizes", 24))
     invalid("cursor-data-empty.dat", start + cursor()[:-8].replace(le32(28), le32(20)).replace(le32(8), le32(0)),
