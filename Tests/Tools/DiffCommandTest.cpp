@@ -176,7 +176,7 @@ TEST_F(DiffCommand, ComparesWhatIsWholeOfATornStream) {
         runTool({"diff", write("a.dat", appNameStream()), write("b.dat", appNameStream().substr(0, 50))});
     EXPECT_EQ(result.exitCode, 3);
     EXPECT_THAT(result.output, HasSubstr("0 changed, 0 added, 1 removed, 1 the same"));
-    EXPECT_THAT(result.output, HasSubstr("behind the last entry: 0 and 11 bytes"));
+    EXPECT_THAT(result.output, HasSubstr("after the last entry: 0 and 11 bytes"));
     EXPECT_THAT(result.errors, HasSubstr("cannot be read from offset 39 on; 'zulm verify"));
 }
 

@@ -6,6 +6,8 @@
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
+#include <filesystem>
+
 namespace ZULMetaData::Test {
 namespace {
 
@@ -88,6 +90,80 @@ TEST_F(GrepCommand, RefusesKindsWithoutTexts) {
         EXPECT_EQ(result.output, "");
         EXPECT_THAT(result.errors, HasSubstr("has no text to search; choose from slideTitles, slideText, slideComment, "
                                              "systemData, topmostAppName, topmostWindowTitle"));
+    }
+}
+
+TEST_F(GrepCommand, FindsWhatDoesNotMatch) {
+    EXPECT_EQ(runTool({"grep", "-v", "^N.t", names()}).output, names() + ":topmostAppName:0.500000: Abc\n");
+    EXPECT_EQ(runTool({"grep", "--invert-match", ".", names()}).exitCode, 4);
+    EXPECT_EQ(runTool({"-v", "grep", "Notes", names()}).exitCode, 0); // the option of every command
+}
+
+TEST_F(GrepCommand, ListsOnlyTheFiles) {
+    const std::string other = named("nothing");
+    const ToolResult result = runTool({"grep", "-l", "Notes", other, names()});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_EQ(result.output, names() + "\n");
+    EXPECT_EQ(runTool({"grep", "-l", "nowhere", other, names()}).exitCode, 4);
+}
+
+TEST_F(GrepCommand, CountsTheMatchesOfEveryFile) {
+    const std::string other = named("nothing");
+    EXPECT_EQ(runTool({"grep", "-c", "[No]", other, names()}).output, other + ":1\n" + names() + ":1\n");
+    const ToolResult none = runTool({"grep", "--count", "nowhere", names()});
+    EXPECT_EQ(none.exitCode, 4);
+    EXPECT_EQ(none.output, names() + ":0\n");
+}
+
+TEST_F(GrepCommand, PrintsOnlyTheParts) {
+    const std::string file = named("one 1 two 22 \xc3\xa4 3");
+    const std::string start = file + ":topmostAppName:1.000000: ";
+    EXPECT_EQ(runTool({"grep", "-o", "[0-9]+", file}).output, start + "1\n" + start + "22\n" + start + "3\n");
+    EXPECT_EQ(runTool({"grep", "-o", "\\b[a-z]", file}).output, start + "o\n" + start + "t\n");
+    EXPECT_EQ(runTool({"grep", "-o", "x*", file}).output, ""); // it matches, but only what is empty
+}
+
+TEST_F(GrepCommand, PrintsTheComposedPartsOfADecomposedText) {
+    const std::string file = named("Mu\xcc\x88ller 1");
+    EXPECT_EQ(runTool({"grep", "-o", "M\xc3\xbcller", file}).output,
+              file + ":topmostAppName:1.000000: M\xc3\xbcller\n");
+}
+
+TEST_F(GrepCommand, SearchesFolders) {
+    std::filesystem::create_directories(folder.path() / "a" / "b");
+    const std::string first = write("a/b/first.mp4", media() + zulmAtom({appNameStream()}));
+    const std::string second = write("a/second.dat", streamHeader(s_appNames, 1, 0) + textEntry(1, "Notes"));
+    write("a/notes.txt", "Notes");
+    std::filesystem::create_directory_symlink(folder.path() / "a", folder.path() / "a" / "again");
+    const ToolResult result = runTool({"grep", "-rl", "Notes", folder / "a"});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_EQ(result.errors, "");
+    EXPECT_EQ(result.output, first + '\n' + second + '\n');
+    const ToolResult without = runTool({"grep", "Notes", folder / "a"});
+    EXPECT_EQ(without.exitCode, 1);
+    EXPECT_THAT(without.errors, HasSubstr("is a folder"));
+    const Json document = Json::parse(runTool({"grep", "-r", "--json", "Notes", folder / "a"}).output);
+    EXPECT_EQ(document["files"].size(), 2U);
+    EXPECT_EQ(document["files"][1]["path"], second);
+}
+
+TEST_F(GrepCommand, SaysNothingWhenQuiet) {
+    const ToolResult found = runTool({"grep", "-q", "Notes", names(), folder / "none.mp4"});
+    EXPECT_EQ(found.exitCode, 0); // the first match ends the search
+    EXPECT_EQ(found.output + found.errors, "");
+    const ToolResult nothing = runTool({"grep", "-q", "nowhere", names()});
+    EXPECT_EQ(nothing.exitCode, 4);
+    EXPECT_EQ(nothing.output + nothing.errors, "");
+}
+
+TEST_F(GrepCommand, RefusesOptionsThatContradictEachOther) {
+    for (const std::vector<std::string>& options : std::vector<std::vector<std::string>>{
+             {"-l", "-c"}, {"-l", "-o"}, {"-c", "-o"}, {"-o", "-v"}, {"-l", "--json"}, {"-c", "--json"}}) {
+        std::vector<std::string> arguments{"grep", "x", "a.mp4"};
+        arguments.insert(arguments.end(), options.begin(), options.end());
+        const ToolResult result = runTool(arguments);
+        EXPECT_EQ(result.exitCode, 2) << options[0] << options[1];
+        EXPECT_THAT(result.errors, HasSubstr("cannot be given together with"));
     }
 }
 

@@ -185,7 +185,7 @@ void addConvertCommand(CLI::App& app, Action& chosen) {
                     "What to write: keyboardAction, or a kind of texts (repeatable). Without it, keyboardAction as "
                     "captions, slideTitles and topmostWindowTitle as chapters");
     addSeconds(*command, "--pause", options->pause,
-               "Keys further apart than this make two captions (1 second unless it is given)");
+               "Begin a new caption after a pause of this length; the default is 1 second");
     command->add_flag("--show-keys", options->showsKeys, "Show what was typed, passwords included");
     command->add_flag("--force", options->force, "Replace OUT where it exists");
     command->footer("zulm convert --to srt Recording.mp4 -o Recording.srt\n"

@@ -68,10 +68,10 @@ void addDemoCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<DemoOptions>();
     CLI::App* command = app.add_subcommand(
         "demo", "Record a simulated session into a movie, read it back and check that it is the same");
-    command->add_option("DIR", options->folder, "Where the movie and its stream files go")->required();
-    command->add_option("--movie", options->movie, "Record into a copy of this movie, not into a still picture")
+    command->add_option("DIR", options->folder, "The folder for the movie and its stream files")->required();
+    command->add_option("--movie", options->movie, "Record into a copy of this movie instead of a still picture")
         ->type_name("MOVIE");
-    command->add_flag("--force", options->force, "Replace a recording that is there already");
+    command->add_flag("--force", options->force, "Replace a recording that exists already");
     command->footer("zulm demo demo-output && zulm info demo-output/Recording.mp4");
     command->callback([options, &chosen] { chosen = [options] { return runDemo(*options); }; });
 }

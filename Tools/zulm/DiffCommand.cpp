@@ -76,7 +76,7 @@ public:
     std::optional<MetaDataHeader> header() const { return entries_.header(); }
     Json document() const { return documentOf(*header(), bytes_); }
 
-    /// Not beyond an entry that does not fit its kind.
+    /// Ends at an entry that does not fit its kind.
     void advance() {
         end_ = entries_.wholeBytes();
         current_ = entries_.next();
@@ -89,7 +89,7 @@ public:
         time_ = time.value_or(std::numeric_limits<double>::quiet_NaN());
     }
 
-    /// Bytes behind the last entry that could be compared.
+    /// The number of bytes after the last entry that could be compared.
     std::uint64_t rest() const { return stream_.declared - end_; }
 
     ExitCode complainAboutRest() const {
@@ -238,7 +238,7 @@ private:
         writeOutput(fmt::format("  {}: {} changed, {} added, {} removed, {} the same\n", heading_.name(), changed_,
                                 added_, removed_, same_));
         if (left_.rest() != right_.rest())
-            writeOutput(fmt::format("  behind the last entry: {} and {} bytes\n", left_.rest(), right_.rest()));
+            writeOutput(fmt::format("  after the last entry: {} and {} bytes\n", left_.rest(), right_.rest()));
     }
 
     const DiffOptions& options_;
@@ -394,15 +394,17 @@ ExitCode runDiff(const DiffOptions& options) {
 void addDiffCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<DiffOptions>();
     CLI::App* command = app.add_subcommand(
-        "diff", "Show which streams and entries differ: - only in A, + only in B, < and > what A and B have at one "
-                "time. Ends with 0 where nothing does, with 3 where something does");
+        "diff", "Show which streams and entries differ. A line with - is only in A, one with + only in B, and < and > "
+                "stand before what A and B have at one time. Ends with 0 if nothing differs and with 3 if something "
+                "does");
     command->add_option("A", options->left, "A movie, RIFF file or stream file; - is standard input")->required();
-    command->add_option("B", options->right, "What to compare it with, likewise")->required();
-    addStreamOption(*command, options->kinds, "Only this kind, such as cursorLocation, or UUID (repeatable)");
+    command->add_option("B", options->right, "The file to compare it with")->required();
+    addStreamOption(*command, options->kinds,
+                    "Compare only this kind, such as cursorLocation, or this UUID (repeatable)");
     addCount(*command, "--limit", options->limit,
-             "List at most this many differences of each stream (100 unless it is given, 0 for all)");
+             "List at most this many differences of each stream; the default is 100, and 0 lists all");
     addSeconds(*command, "--tolerance", options->tolerance,
-               "Entries with the same value are the same if their times differ by at most this");
+               "Take entries with equal values for the same if their times differ by no more than this");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm diff Original.mp4 Edited.mp4\n"
                     "zulm diff --stream keyboardAction --limit 0 Original.mp4 Edited.mp4");

@@ -184,9 +184,10 @@ void addDumpCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<DumpOptions>();
     CLI::App* command = app.add_subcommand("dump", "Print the entries of the streams of one or several files");
     command->add_option("FILE", options->files, "Movies, RIFF files or stream files; - is standard input")->required();
-    addStreamOption(*command, options->kinds, "Only this kind, such as cursorLocation, or UUID (repeatable)");
+    addStreamOption(*command, options->kinds,
+                    "Print only this kind, such as cursorLocation, or this UUID (repeatable)");
     addChoice(*command, "--format", options->format,
-              "How entries are printed. csv has one table for every stream, an empty line between them",
+              "How entries are printed. csv has one table for every stream, with an empty line between two tables",
               {{"text", EntryFormat::Text},
                {"json", EntryFormat::JSON},
                {"ndjson", EntryFormat::NDJSON},
@@ -197,11 +198,12 @@ void addDumpCommand(CLI::App& app, Action& chosen) {
             "Print only these members of the entries, such as timestamp,x,y, and only the streams that have some of "
             "them. With csv, ndjson and text, stream and file may be among them")
         ->type_name("NAMES");
-    addSeconds(*command, "--from", options->from, "Only entries at this time or later", Sign::Any);
-    addSeconds(*command, "--to", options->to, "Only entries at this time or earlier", Sign::Any);
-    command->add_option("--images", options->imageFolder, "Write cursor images into this folder, as they are stored")
+    addSeconds(*command, "--from", options->from, "Print only entries at this time or later", Sign::Any);
+    addSeconds(*command, "--to", options->to, "Print only entries at this time or earlier", Sign::Any);
+    command
+        ->add_option("--images", options->imageFolder, "Write the cursor images into this folder, as they are stored")
         ->type_name("DIR");
-    command->add_flag("--force", options->force, "Replace images that are there already");
+    command->add_flag("--force", options->force, "Replace images that exist already");
     command->footer("zulm dump --stream keyboardAction --from 10 --to 20 Recording.mp4\n"
                     "zulm dump --format csv --stream cursorLocation Recording.mp4 > cursor.csv");
     command->callback([options, &chosen] {

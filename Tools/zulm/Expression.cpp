@@ -33,6 +33,16 @@ bool isFoundIn(const char* text, std::size_t size, const Expression& expression)
     return RE2::PartialMatch(re2::StringPiece(text, size), expression);
 }
 
+bool findIn(const char* text, std::size_t size, std::size_t start, const Expression& expression, std::size_t& begin,
+            std::size_t& end) {
+    re2::StringPiece found;
+    if (!expression.Match(re2::StringPiece(text, size), start, size, RE2::UNANCHORED, &found, 1))
+        return false;
+    begin = static_cast<std::size_t>(found.data() - text);
+    end = begin + found.size();
+    return true;
+}
+
 void releaseExpression(Expression* expression) noexcept {
     delete expression;
 }

@@ -18,6 +18,11 @@ const char* errorIn(const Expression& expression) noexcept;
 /// Whether it is anywhere in the text, which is UTF-8.
 bool isFoundIn(const char* text, std::size_t size, const Expression& expression);
 
+/// Looks for it from `start` on; what precedes `start` still counts for anchors and word boundaries. Returns false if
+/// it is not there, and otherwise where it begins and ends.
+bool findIn(const char* text, std::size_t size, std::size_t start, const Expression& expression, std::size_t& begin,
+            std::size_t& end);
+
 void releaseExpression(Expression* expression) noexcept;
 
 } // namespace Zulm

@@ -92,11 +92,14 @@ void addExtractCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<ExtractOptions>();
     CLI::App* command = app.add_subcommand("extract", "Write each stream of a file as a stream file, byte for byte");
     command->add_option("FILE", options->file, "A movie, RIFF file or stream file; - is standard input")->required();
-    command->add_option("-o,--output", options->folder, "The folder for KIND.dat, or UUID.dat of an unknown kind")
+    command
+        ->add_option("-o,--output", options->folder,
+                     "The folder for the stream files. A file is called KIND.dat, or UUID.dat if its kind is unknown")
         ->type_name("DIR")
         ->required();
-    addStreamOption(*command, options->kinds, "Only this kind, such as cursorLocation, or UUID (repeatable)");
-    command->add_flag("--force", options->force, "Replace files that exist");
+    addStreamOption(*command, options->kinds,
+                    "Write only this kind, such as cursorLocation, or this UUID (repeatable)");
+    command->add_flag("--force", options->force, "Replace files that exist already");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm extract Recording.mp4 -o streams\n"
                     "zulm extract Recording.mp4 -o streams --stream keyboardAction");

@@ -232,7 +232,7 @@ ExitCode write(const RedactOptions& options, Recording& recording, RunReport& re
 }
 
 ExitCode runRedact(const RedactOptions& options) {
-    return withReport("redact", options.json, {options.file}, [&](RunReport& report) {
+    return withReport("redact", options.json, {options.file, options.output}, [&](RunReport& report) {
         const InputFile input(options.file);
         Recording recording(input.path(), input.name());
         if (options.dryRun)

@@ -125,15 +125,17 @@ ExitCode runSalvage(const SalvageOptions& options) {
 void addSalvageCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<SalvageOptions>();
     CLI::App* command = app.add_subcommand(
-        "salvage", "Search a damaged file for metadata streams, and write what is whole. Ends with 3 where something "
+        "salvage", "Search a damaged file for metadata streams, and write what is whole. Ends with 3 if something "
                    "was out of reach or is cut short");
     command->add_option("FILE", options->file, "Any file; - is standard input")->required();
     command
-        ->add_option("-o,--output", options->folder,
-                     "The folder for KIND.dat; of several streams of one kind, the lesser become KIND-2.dat and so on")
+        ->add_option(
+            "-o,--output", options->folder,
+            "The folder for the stream files. The best stream of a kind becomes KIND.dat, the next one KIND-2.dat and "
+            "so on")
         ->type_name("DIR")
         ->required();
-    command->add_flag("--force", options->force, "Replace files that exist");
+    command->add_flag("--force", options->force, "Replace files that exist already");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm salvage Broken.mp4 -o rescued\n"
                     "zulm salvage Broken.mp4 -o rescued && zulm attach Copy.mp4 rescued/*.dat -o Whole.mp4");

@@ -14,12 +14,12 @@ Settings& settings() {
 }
 
 void addSettings(CLI::App& app) {
-    CLI::Option* quiet = app.add_flag(
-        "-q,--quiet", settings().quiet,
-        "Print no warnings, no progress and not what was done. grep prints nothing then, diff only which streams "
-        "differ, verify only what it finds");
-    app.add_flag("-v,--verbose", settings().verbose, "Say on standard error what is done")->excludes(quiet);
-    app.add_flag("--no-progress", settings().noProgress, "Show no progress on a terminal");
+    CLI::Option* quiet = app.add_flag("-q,--quiet", settings().quiet,
+                                      "Print no warnings, no progress and no account of what was done. grep prints "
+                                      "nothing then, diff only which streams "
+                                      "differ, verify only what it finds");
+    app.add_flag("-v,--verbose", settings().verbose, "Print what is done on standard error")->excludes(quiet);
+    app.add_flag("--no-progress", settings().noProgress, "Print no progress on a terminal");
     addChoice(app, "--color", settings().color, "Whether headings and messages are coloured (auto: on a terminal)",
               {{"auto", ColorMode::Auto}, {"always", ColorMode::Always}, {"never", ColorMode::Never}});
 }

@@ -15,6 +15,28 @@ std::unique_ptr<Expression, void (*)(Expression*) noexcept> compiled(const std::
     return {compileExpression(pattern.data(), pattern.size(), ignoreCase, isFixed), releaseExpression};
 }
 
+/// Where the next character of UTF-8 begins.
+std::size_t afterCharacter(const std::string& text, std::size_t position) {
+    constexpr auto isContinuation = [](char byte) { return (static_cast<unsigned char>(byte) & 0xc0U) == 0x80U; };
+    do
+        ++position;
+    while (position < text.size() && isContinuation(text[position]));
+    return position;
+}
+
+std::vector<std::string> partsIn(const std::string& text, const Expression& expression) {
+    std::vector<std::string> parts;
+    std::size_t begin = 0;
+    std::size_t end = 0;
+    for (std::size_t start = 0;
+         start <= text.size() && findIn(text.data(), text.size(), start, expression, begin, end);) {
+        if (end > begin)
+            parts.push_back(text.substr(begin, end - begin));
+        start = end > begin ? end : afterCharacter(text, end);
+    }
+    return parts;
+}
+
 } // namespace
 
 TextPattern::TextPattern(const std::string& pattern, bool ignoreCase, bool isFixed)
@@ -31,6 +53,11 @@ bool TextPattern::matches(const std::string& text) const {
     if (isComposed_ && form == text)
         return false; // that has been tried
     return isFoundIn(form.data(), form.size(), *composed_);
+}
+
+std::vector<std::string> TextPattern::partsOf(const std::string& text) const {
+    std::vector<std::string> parts = partsIn(text, *expression_);
+    return parts.empty() ? partsIn(composed(text), *composed_) : parts;
 }
 
 } // namespace Zulm

@@ -2,6 +2,7 @@
 
 #include <memory>
 #include <string>
+#include <vector>
 
 namespace Zulm {
 
@@ -16,6 +17,10 @@ public:
 
     /// Returns whether the expression is found anywhere in `text`, which is UTF-8.
     bool matches(const std::string& text) const;
+
+    /// Returns the parts of `text` that match, from left to right, without those that are empty. A text that matches
+    /// only in the composed form gives parts of that form.
+    std::vector<std::string> partsOf(const std::string& text) const;
 
 private:
     using ExpressionOwner = std::unique_ptr<Expression, void (*)(Expression*) noexcept>;

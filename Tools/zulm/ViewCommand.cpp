@@ -148,9 +148,8 @@ void addViewCommand(CLI::App& app, Action& chosen) {
     command->add_option("FILE", options->file, "A movie, RIFF file or stream file; - is standard input")->required();
     command->add_option("-o,--output", options->output, "The page to write")->type_name("OUT")->required();
     command->add_flag("--embed", options->embed, "Put the movie into the page, which makes it large");
-    command->add_option("--page", options->page, "Show the recording in this page in place of the built-in one")
-        ->type_name("PAGE");
-    command->add_flag("--force", options->force, "Replace OUT where it exists");
+    command->add_option("--page", options->page, "Use this page instead of the built-in one")->type_name("PAGE");
+    command->add_flag("--force", options->force, "Replace OUT if it exists");
     command->footer("zulm view Recording.mp4 -o Recording.html\n"
                     "zulm view Recording.mp4 -o ToSend.html --embed");
     command->callback([options, &chosen] { chosen = [options] { return runView(*options); }; });
