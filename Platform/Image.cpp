@@ -1,5 +1,7 @@
 #include "Platform/Image.h"
 
+#include "Platform/ImageLimits.h"
+#include "Platform/PNGChunks.h"
 #include "Platform/PNGCodec.h"
 #include "Platform/TIFFCodec.h"
 
@@ -65,6 +67,12 @@ std::optional<Image> Image::fromEncodedBytes(std::span<const std::uint8_t> encod
 
 std::optional<EncodedImageInfo> Image::infoOfEncodedBytes(std::span<const std::uint8_t> encoded) {
     return orOutOfMemory([&] { return readInfo(encoded); }, [] { return s_smallWork; });
+}
+
+EncodedImageCheck Image::checkEncodedBytes(std::span<const std::uint8_t> encoded, std::uint64_t memory) {
+    const std::uint64_t most = std::min(memory, s_mostUnpackedToCheck);
+    return orOutOfMemory([&] { return hasPNGSignature(encoded) ? checkPNG(encoded) : checkTIFF(encoded, most); },
+                         [&] { return std::min(neededToDecode(encoded), most); });
 }
 
 std::vector<std::uint8_t> Image::tiffRepresentation() const {

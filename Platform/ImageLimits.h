@@ -15,6 +15,10 @@ inline constexpr std::uint32_t s_maximumImageSide = 16384;
 /// The best ratio that a deflate stream can reach (258 bytes from two bits), with a little room.
 inline constexpr std::uint64_t s_maximumDeflateRatio = 1040;
 
+/// Bytes of pixels that a check unpacks at most, and of memory that it takes at most. A cursor of 512 x 512 pixels has
+/// a megabyte of them; so many take a tenth of a second.
+inline constexpr std::uint64_t s_mostUnpackedToCheck = std::uint64_t{32} << 20;
+
 constexpr bool isImageSizeAllowed(std::uint32_t width, std::uint32_t height) noexcept {
     return width > 0 && height > 0 && width <= s_maximumImageSide && height <= s_maximumImageSide;
 }

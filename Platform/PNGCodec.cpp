@@ -1,11 +1,13 @@
 #include "Platform/PNGCodec.h"
 
 #include "Platform/ImageLimits.h"
+#include "Platform/PNGChunks.h"
 
 #include <png.h>
 
 #include <algorithm>
 #include <csetjmp>
+#include <limits>
 #include <new>
 #include <type_traits>
 #include <utility>
@@ -14,7 +16,8 @@ namespace ZULMetaData {
 
 namespace {
 
-constexpr std::size_t s_signatureSize = 8;
+/// How much compressed data after the last pixel is looked into. It can unpack to a thousand times as much.
+constexpr std::size_t s_mostSurplusRead = std::size_t{4} << 10;
 
 [[noreturn]] void jumpOut(png_structp png, png_const_charp) {
     png_longjmp(png, 1);
@@ -47,12 +50,17 @@ public:
     std::uint32_t width() const { return width_; }
     std::uint32_t height() const { return height_; }
 
-    bool readHeader() {
-        return info_ != nullptr && unlessLibraryJumps(png_, [this] {
+    enum class Pixels { RGBA, AsStored };
+
+    bool readHeader(Pixels pixels) {
+        return info_ != nullptr && unlessLibraryJumps(png_, [this, pixels] {
                    beStrict();
                    png_read_info(png_, info_);
                    noteLayout();
-                   convertToRGBA();
+                   if (pixels == Pixels::RGBA)
+                       convertToRGBA();
+                   passes_ = png_set_interlace_handling(png_);
+                   png_read_update_info(png_, info_);
                });
     }
 
@@ -71,6 +79,23 @@ public:
             png_read_end(png_, nullptr);
         });
     }
+
+    /// The same without keeping a pixel. `pixelsEnd` is the offset after the last chunk of pixels.
+    bool skipPixels(std::size_t pixelsEnd) {
+        return unlessLibraryJumps(png_, [this, pixelsEnd] {
+            for (int pass = 0; pass < passes_; ++pass) {
+                for (std::uint32_t row = 0; row < height_; ++row) {
+                    if (pass + 1 == passes_ && row + 1 == height_)
+                        limitSurplus(pixelsEnd);
+                    png_read_row(png_, nullptr, nullptr);
+                }
+            }
+            png_read_end(png_, nullptr);
+        });
+    }
+
+    /// Compressed bytes after the last pixel, if they were too many to be unpacked.
+    std::size_t surplus() const { return surplus_; }
 
 private:
     void beStrict() {
@@ -93,14 +118,29 @@ private:
         png_set_expand(png_);
         png_set_gray_to_rgb(png_);
         png_set_add_alpha(png_, 0xFF, PNG_FILLER_AFTER);
-        passes_ = png_set_interlace_handling(png_);
-        png_read_update_info(png_, info_);
     }
 
+    /// With the last row, libpng unpacks all that follows it, only to refuse it in the end.
+    void limitSurplus(std::size_t pixelsEnd) {
+        const std::size_t lastRow = png_get_rowbytes(png_, info_);
+        const std::size_t limit = offset() + lastRow + s_mostSurplusRead;
+        if (limit < pixelsEnd) {
+            limit_ = limit;
+            pixelsEnd_ = pixelsEnd;
+        }
+    }
+
+    std::size_t offset() const { return encoded_.size() - remaining_.size(); }
+
     static void takeBytes(png_structp png, png_bytep target, png_size_t count) {
-        auto& remaining = static_cast<PNGReader*>(png_get_io_ptr(png))->remaining_;
+        auto& reader = *static_cast<PNGReader*>(png_get_io_ptr(png));
+        auto& remaining = reader.remaining_;
         if (count > remaining.size()) {
             png_error(png, "file is cut short");
+        }
+        if (reader.offset() + count > reader.limit_) {
+            reader.surplus_ = reader.pixelsEnd_ - reader.offset();
+            png_error(png, "too much image data");
         }
         std::copy_n(remaining.begin(), count, target);
         remaining = remaining.subspan(count);
@@ -114,6 +154,9 @@ private:
     std::uint32_t height_ = 0;
     std::uint64_t storedSize_ = 0; // bytes of all rows before compression, in the file's own pixel format
     int passes_ = 0;
+    std::size_t limit_ = std::numeric_limits<std::size_t>::max(); // an offset that is not read beyond
+    std::size_t pixelsEnd_ = 0;
+    std::size_t surplus_ = 0;
 };
 
 // A recording encodes its cursors while it runs. Nearly all are small pictures of flat colours and repeated rows, on
@@ -197,13 +240,9 @@ std::vector<std::uint8_t> encodedWith(PNGEffort effort, const Image& image) {
 
 } // namespace
 
-bool hasPNGSignature(std::span<const std::uint8_t> encoded) noexcept {
-    return encoded.size() >= s_signatureSize && png_sig_cmp(encoded.data(), 0, s_signatureSize) == 0;
-}
-
 std::optional<Image> decodePNG(std::span<const std::uint8_t> encoded) {
     PNGReader reader(encoded);
-    if (!reader.readHeader() || !reader.isPlausible()) {
+    if (!reader.readHeader(PNGReader::Pixels::RGBA) || !reader.isPlausible()) {
         return std::nullopt;
     }
     std::vector<std::uint8_t> rgba(rgbaSize(reader.width(), reader.height()));
@@ -215,10 +254,26 @@ std::optional<Image> decodePNG(std::span<const std::uint8_t> encoded) {
 
 std::optional<EncodedImageInfo> readPNGInfo(std::span<const std::uint8_t> encoded) {
     PNGReader reader(encoded);
-    if (!reader.readHeader() || !reader.isPlausible()) {
+    if (!reader.readHeader(PNGReader::Pixels::RGBA) || !reader.isPlausible()) {
         return std::nullopt;
     }
     return EncodedImageInfo{reader.width(), reader.height(), memoryToDecodePNG(reader.width(), reader.height())};
+}
+
+EncodedImageCheck checkPNG(std::span<const std::uint8_t> encoded) {
+    const auto chunks = walkPNGChunks(encoded);
+    PNGReader reader(encoded);
+    if (!chunks || !reader.readHeader(PNGReader::Pixels::AsStored)) {
+        return {};
+    }
+    EncodedImageCheck check{EncodedImageCheck::NotUnpacked, chunks->width, chunks->height, chunks->unpackedBytes,
+                            encoded.size() - chunks->end};
+    if (std::max<std::uint64_t>(chunks->unpackedBytes, encoded.size()) <= s_mostUnpackedToCheck) {
+        const bool isWhole = reader.skipPixels(chunks->pixelsEnd);
+        check.state = isWhole ? EncodedImageCheck::Decodable : EncodedImageCheck::Undecodable;
+        check.surplusBytes += reader.surplus();
+    }
+    return check;
 }
 
 std::vector<std::uint8_t> encodePNG(const Image& image) {

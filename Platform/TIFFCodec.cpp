@@ -174,24 +174,49 @@ Extent extentOf(TIFF* tiff) {
     return {field<std::uint32_t>(tiff, TIFFTAG_IMAGEWIDTH), field<std::uint32_t>(tiff, TIFFTAG_IMAGELENGTH)};
 }
 
-// All strips or tiles together may not unpack to more than the file can hold, also where they share their bytes.
-bool isPlausible(TIFF* tiff, Extent extent, std::size_t encodedSize) {
-    if (!isImageSizeAllowed(extent.width, extent.height)) {
-        return false;
-    }
-    const auto ratio = maximumRatio(field<std::uint16_t>(tiff, TIFFTAG_COMPRESSION));
+// The bytes of all rows or tiles, in every plane, before compression; 0 if there are none.
+std::uint64_t unpackedSize(TIFF* tiff, Extent extent) {
     const auto planes = field<std::uint16_t>(tiff, TIFFTAG_PLANARCONFIG) == PLANARCONFIG_SEPARATE
                             ? field<std::uint16_t>(tiff, TIFFTAG_SAMPLESPERPIXEL)
                             : std::uint16_t{1};
     const bool tiled = TIFFIsTiled(tiff) != 0;
     const std::uint64_t pieceSize = tiled ? TIFFTileSize64(tiff) : TIFFScanlineSize64(tiff);
     const std::uint64_t pieces = tiled ? TIFFNumberOfTiles(tiff) : std::uint64_t{extent.height} * planes;
-    return pieceSize > 0 && pieces > 0 && pieceSize <= ratio * encodedSize / pieces;
+    return pieces > 0 && pieceSize > std::numeric_limits<std::uint64_t>::max() / pieces
+               ? std::numeric_limits<std::uint64_t>::max()
+               : pieceSize * pieces;
+}
+
+// All strips or tiles together may not unpack to more than the file can hold, also where they share their bytes.
+bool isPlausible(TIFF* tiff, Extent extent, std::size_t encodedSize) {
+    if (!isImageSizeAllowed(extent.width, extent.height)) {
+        return false;
+    }
+    const std::uint64_t unpacked = unpackedSize(tiff, extent);
+    return unpacked > 0 && unpacked <= maximumRatio(field<std::uint16_t>(tiff, TIFFTAG_COMPRESSION)) * encodedSize;
 }
 
 // Whether the picture is stored with its columns in place of its rows.
 bool isTurned(TIFF* tiff) {
     return field<std::uint16_t>(tiff, TIFFTAG_ORIENTATION) > ORIENTATION_BOTLEFT;
+}
+
+// The bytes of all strips or tiles as they are stored, which may share them.
+struct StoredPieces {
+    std::uint32_t count = 0;
+    std::uint64_t largest = 0;
+    std::uint64_t all = 0;
+};
+
+StoredPieces storedPieces(TIFF* tiff) {
+    StoredPieces pieces;
+    pieces.count = TIFFIsTiled(tiff) != 0 ? TIFFNumberOfTiles(tiff) : TIFFNumberOfStrips(tiff);
+    for (std::uint32_t piece = 0; piece < pieces.count; ++piece) {
+        const std::uint64_t size = TIFFGetStrileByteCount(tiff, piece);
+        pieces.largest = std::max(pieces.largest, size);
+        pieces.all += std::min<std::uint64_t>(size, std::numeric_limits<std::uint32_t>::max());
+    }
+    return pieces;
 }
 
 // What decoding may hold at a time: the pixels, twice where they are turned, a strip or tile of each plane that is
@@ -200,17 +225,20 @@ std::uint64_t memoryToDecode(TIFF* tiff, Extent extent, std::size_t encodedSize)
     constexpr std::uint64_t firstStep = std::uint64_t{1} << 20;
     constexpr std::uint64_t largestGrowth = 11;
     constexpr std::uint64_t planes = 4;
-    const bool tiled = TIFFIsTiled(tiff) != 0;
-    const std::uint64_t pieceSize = tiled ? TIFFTileSize64(tiff) : TIFFStripSize64(tiff);
-    const std::uint32_t pieces = tiled ? TIFFNumberOfTiles(tiff) : TIFFNumberOfStrips(tiff);
-    std::uint64_t stored = 0;
-    for (std::uint32_t piece = 0; piece < pieces; ++piece) {
-        stored = std::max<std::uint64_t>(stored, TIFFGetStrileByteCount(tiff, piece));
-    }
-    const std::uint64_t read = std::min<std::uint64_t>(stored, largestGrowth * encodedSize + firstStep);
+    const std::uint64_t pieceSize = TIFFIsTiled(tiff) != 0 ? TIFFTileSize64(tiff) : TIFFStripSize64(tiff);
+    const StoredPieces stored = storedPieces(tiff);
+    const std::uint64_t read = std::min<std::uint64_t>(stored.largest, largestGrowth * encodedSize + firstStep);
     const std::uint64_t copies = isTurned(tiff) ? 2 : 1;
     return copies * rgbaSize(extent.width, extent.height) + planes * pieceSize + read +
-           2 * sizeof(std::uint64_t) * pieces;
+           2 * sizeof(std::uint64_t) * stored.count;
+}
+
+// Whether decoding takes too long for a check. A JPEG file may go over all of its pixels a hundred times.
+bool isTooMuchWork(TIFF* tiff, std::uint64_t unpacked) {
+    constexpr std::uint64_t costOfJPEG = 32;
+    const bool isJPEG = field<std::uint16_t>(tiff, TIFFTAG_COMPRESSION) == COMPRESSION_JPEG;
+    return unpacked * (isJPEG ? costOfJPEG : 1) > s_mostUnpackedToCheck ||
+           storedPieces(tiff).all > s_mostUnpackedToCheck;
 }
 
 // Of the channels behind the colours. Where there was no memory for them libtiff keeps their number alone, and stumbles
@@ -363,6 +391,22 @@ std::optional<EncodedImageInfo> readTIFFInfo(std::span<const std::uint8_t> encod
     const std::uint64_t memory = memoryToDecode(tiff.get(), extent, encoded.size());
     return isTurned(tiff.get()) ? EncodedImageInfo{extent.height, extent.width, memory}
                                 : EncodedImageInfo{extent.width, extent.height, memory};
+}
+
+EncodedImageCheck checkTIFF(std::span<const std::uint8_t> encoded, std::uint64_t memory) {
+    const auto info = readTIFFInfo(encoded);
+    Troubles troubles;
+    Input input{encoded};
+    const Handle tiff = info ? openForReading(input, troubles) : nullptr;
+    if (!tiff) {
+        return {};
+    }
+    const std::uint64_t unpacked = unpackedSize(tiff.get(), extentOf(tiff.get()));
+    EncodedImageCheck check{EncodedImageCheck::NotUnpacked, info->width, info->height, unpacked, 0};
+    if (info->decodingMemory <= memory && !isTooMuchWork(tiff.get(), unpacked)) {
+        check.state = decodeTIFF(encoded) ? EncodedImageCheck::Decodable : EncodedImageCheck::Undecodable;
+    }
+    return check;
 }
 
 std::optional<Image> decodeTIFF(std::span<const std::uint8_t> encoded) {

@@ -21,6 +21,9 @@ std::optional<Image> decodeTIFF(std::span<const std::uint8_t> encoded);
 /// By its directory; nothing where `decodeTIFF` would refuse it at once.
 std::optional<EncodedImageInfo> readTIFFInfo(std::span<const std::uint8_t> encoded);
 
+/// Decodes the picture and drops it, if that takes no more than `memory` bytes.
+EncodedImageCheck checkTIFF(std::span<const std::uint8_t> encoded, std::uint64_t memory);
+
 /// Little-endian, one uncompressed strip of RGBA with straight alpha. Empty where the image cannot be encoded.
 std::vector<std::uint8_t> encodeTIFF(const Image& image);
 

@@ -207,6 +207,14 @@ std::optional<EncodedImageInfo> readTIFFInfo(Bytes encoded) {
     return EncodedImageInfo{width, height, memoryToDecode(*directory, *layout, encoded.size())};
 }
 
+EncodedImageCheck checkTIFF(Bytes encoded, std::uint64_t) {
+    const auto image = decodeTIFF(encoded);
+    if (!image)
+        return {};
+    const auto layout = layoutOf(*directoryOf(encoded));
+    return {EncodedImageCheck::Decodable, image->width(), image->height(), layout->rowSize * layout->height, 0};
+}
+
 std::optional<Image> decodeTIFF(Bytes encoded) {
     const auto directory = directoryOf(encoded);
     const auto layout = directory ? layoutOf(*directory) : std::nullopt;

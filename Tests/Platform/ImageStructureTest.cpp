@@ -22,6 +22,12 @@ void expectSize(const Bytes& encoded, std::uint32_t width, std::uint32_t height)
     EXPECT_EQ(image->width(), width);
     EXPECT_EQ(image->height(), height);
     EXPECT_TRUE(image->rgba().empty());
+    const EncodedImageCheck check = Image::checkEncodedBytes(encoded);
+    EXPECT_EQ(check.state, EncodedImageCheck::Decodable);
+    EXPECT_EQ(check.width, width);
+    EXPECT_EQ(check.height, height);
+    EXPECT_GE(check.unpackedBytes, std::uint64_t{width} * height / 8);
+    EXPECT_EQ(check.surplusBytes, 0U);
 }
 
 TEST(ImageStructure, TellsTheSizeOfPNGFiles) {
@@ -69,9 +75,15 @@ TEST(ImageStructure, RefusesWhatIsNoImage) {
     for (const Bytes& bytes : {Bytes{}, Bytes{'I', 'I', 42, 0}, Bytes(100, 0), Bytes(100, 0xff), Bytes(100, 'M')}) {
         EXPECT_FALSE(Image::infoOfEncodedBytes(bytes).has_value());
         EXPECT_FALSE(Image::fromEncodedBytes(bytes).has_value());
+        EXPECT_EQ(Image::checkEncodedBytes(bytes).state, EncodedImageCheck::Undecodable);
     }
     EXPECT_FALSE(Image::fromEncodedBytes(encodedElsewhere("-size 20x20 xc:white -monochrome -compress Group4", "a.tif"))
                      .has_value());
+}
+
+TEST(ImageStructure, CountsBytesAfterTheEndOfAPNGFile) {
+    const Bytes png = encodedElsewhere("-size 9x11 plasma:fractal", "PNG32:a.png");
+    EXPECT_EQ(Image::checkEncodedBytes(png + Bytes(7)).surplusBytes, 7U);
 }
 
 TEST(ImageStructure, EncodesNothing) {

@@ -113,6 +113,17 @@ Bytes rgbaDecodedElsewhere(const Bytes& encoded, const std::string& fileName) {
     return rgba;
 }
 
+std::optional<Image> decoded(std::span<const std::uint8_t> encoded) {
+    const EncodedImageCheck check = Image::checkEncodedBytes(encoded);
+    auto image = Image::fromEncodedBytes(encoded);
+    EXPECT_NE(check.state, image ? EncodedImageCheck::Undecodable : EncodedImageCheck::Decodable);
+    if (image) {
+        EXPECT_EQ(check.width, image->width());
+        EXPECT_EQ(check.height, image->height());
+    }
+    return image;
+}
+
 Image randomImage(std::mt19937& random, std::uint32_t maximumSide) {
     std::uniform_int_distribution<std::uint32_t> side(1, maximumSide);
     const auto width = side(random);
@@ -157,11 +168,11 @@ void expectSameAsElsewhere(const Bytes& encoded, const std::string& fileName) {
 }
 
 void expectNoImageFromAnyPrefix(const Bytes& encoded) {
-    ASSERT_TRUE(Image::fromEncodedBytes(encoded).has_value());
+    ASSERT_TRUE(decoded(encoded).has_value());
     for (std::size_t length = 0; length < encoded.size(); ++length) {
         // A copy of its own, so that a read behind its end is seen by an address checker.
         const Bytes prefix(encoded.begin(), encoded.begin() + static_cast<std::ptrdiff_t>(length));
-        EXPECT_FALSE(Image::fromEncodedBytes(prefix).has_value()) << "cut at " << length;
+        EXPECT_FALSE(decoded(prefix).has_value()) << "cut at " << length;
     }
 }
 

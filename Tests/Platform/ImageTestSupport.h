@@ -47,6 +47,9 @@ CommandResult run(const std::string& command);
 Bytes encodedElsewhere(const std::string& arguments, const std::string& fileName);
 Bytes rgbaDecodedElsewhere(const Bytes& encoded, const std::string& fileName);
 
+/// Decodes, and expects that a check of the file has foretold whether that works and how large the image is.
+std::optional<Image> decoded(std::span<const std::uint8_t> encoded);
+
 Image randomImage(std::mt19937& random, std::uint32_t maximumSide);
 Bytes toBytes(std::span<const std::uint8_t> bytes);
 

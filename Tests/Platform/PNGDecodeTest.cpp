@@ -1,63 +1,17 @@
 #include "Platform/Image.h"
 
 #include "Tests/Platform/ImageTestSupport.h"
+#include "Tests/Platform/PNGFile.h"
 
 #include <gtest/gtest.h>
 
-#include <string_view>
+#include <string>
+#include <utility>
+#include <vector>
 
 namespace ZULMetaData::Test {
 
 namespace {
-
-const Bytes s_signature{0x89, 'P', 'N', 'G', '\r', '\n', 0x1A, '\n'};
-
-enum ColourType : std::uint8_t { Grey = 0, RGB = 2, Palette = 3, GreyAlpha = 4, RGBA = 6 };
-
-std::uint32_t crc32(const Bytes& bytes) {
-    std::uint32_t crc = 0xFFFFFFFFU;
-    for (const auto byte : bytes) {
-        crc ^= byte;
-        for (int bit = 0; bit < 8; ++bit) {
-            crc = (crc >> 1) ^ ((crc & 1U) != 0 ? 0xEDB88320U : 0U);
-        }
-    }
-    return ~crc;
-}
-
-std::uint32_t adler32(const Bytes& bytes) {
-    std::uint32_t a = 1;
-    std::uint32_t b = 0;
-    for (const auto byte : bytes) {
-        a = (a + byte) % 65521;
-        b = (b + a) % 65521;
-    }
-    return (b << 16) | a;
-}
-
-Bytes chunk(std::string_view type, const Bytes& data) {
-    const auto body = Bytes(type.begin(), type.end()) + data;
-    return bigEndian(data.size(), 4) + body + bigEndian(crc32(body), 4);
-}
-
-// A zlib stream of one stored block.
-Bytes stored(const Bytes& raw) {
-    const auto size = static_cast<std::uint16_t>(raw.size());
-    const auto low = static_cast<std::uint8_t>(size);
-    const auto high = static_cast<std::uint8_t>(size >> 8);
-    const Bytes head{0x78, 0x01, 0x01, low, high, static_cast<std::uint8_t>(~low), static_cast<std::uint8_t>(~high)};
-    return head + raw + bigEndian(adler32(raw), 4);
-}
-
-Bytes header(std::uint32_t width, std::uint32_t height, int depth, ColourType type) {
-    return chunk("IHDR",
-                 bigEndian(width, 4) + bigEndian(height, 4) + Bytes{static_cast<std::uint8_t>(depth), type, 0, 0, 0});
-}
-
-const Bytes& end() {
-    static const Bytes bytes = chunk("IEND", {});
-    return bytes;
-}
 
 // One row of samples, given with its filter byte left out.
 Bytes oneRow(std::uint32_t width, int depth, ColourType type, const Bytes& row, const Bytes& chunks = {}) {
@@ -65,11 +19,11 @@ Bytes oneRow(std::uint32_t width, int depth, ColourType type, const Bytes& row, 
 }
 
 void expectRow(const Bytes& png, const Bytes& rgba) {
-    expectPixels(Image::fromEncodedBytes(png), static_cast<std::uint32_t>(rgba.size() / 4), 1, rgba);
+    expectPixels(decoded(png), static_cast<std::uint32_t>(rgba.size() / 4), 1, rgba);
 }
 
 bool givesNoImage(const Bytes& png) {
-    return !Image::fromEncodedBytes(png).has_value();
+    return !decoded(png).has_value();
 }
 
 TEST(PNGDecode, GreyOfOneBit) {
@@ -183,11 +137,11 @@ TEST(PNGDecode, FilesOfAnotherEncoderShowTheSamePixels) {
 }
 
 TEST(PNGDecode, LargePicturesOfOneColourAreNotTakenForHostileOnes) {
-    const auto image = Image::fromEncodedBytes(encodedElsewhere("-size 3000x3000 xc:'#102030'", "PNG32:a.png"));
+    const auto image = decoded(encodedElsewhere("-size 3000x3000 xc:'#102030'", "PNG32:a.png"));
     ASSERT_TRUE(image.has_value());
     EXPECT_EQ(image->width(), 3000U);
     EXPECT_EQ(toBytes(image->rgba().last(4)), (Bytes{0x10, 0x20, 0x30, 0xFF}));
-    EXPECT_TRUE(Image::fromEncodedBytes(encodedElsewhere("-size 5000x5000 xc:white -monochrome", "a.png")).has_value());
+    EXPECT_TRUE(decoded(encodedElsewhere("-size 5000x5000 xc:white -monochrome", "a.png")).has_value());
 }
 
 TEST(PNGDecode, EveryTruncationGivesNoImage) {

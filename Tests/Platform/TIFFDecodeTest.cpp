@@ -119,11 +119,11 @@ Bytes opaqueGreys(const Bytes& levels) {
 }
 
 void expectRow(TIFFFile file, const Bytes& pixels) {
-    expectPixels(Image::fromEncodedBytes(file.bytes()), static_cast<std::uint32_t>(pixels.size() / 4), 1, pixels);
+    expectPixels(decoded(file.bytes()), static_cast<std::uint32_t>(pixels.size() / 4), 1, pixels);
 }
 
 bool givesNoImage(const Bytes& tiff) {
-    return !Image::fromEncodedBytes(tiff).has_value();
+    return !decoded(tiff).has_value();
 }
 
 constexpr std::uint16_t s_unspecified = 0;
@@ -193,7 +193,7 @@ TEST(TIFFDecode, EveryOrientationIsTurnedUpright) {
         SCOPED_TRACE(orientation);
         auto file = grey(3, 2, 8, {1, 2, 3, 4, 5, 6});
         file.set(TIFFFile::Orientation, {orientation++});
-        expectPixels(Image::fromEncodedBytes(file.bytes()), 6 / height, height, opaqueGreys(levels));
+        expectPixels(decoded(file.bytes()), 6 / height, height, opaqueGreys(levels));
         EXPECT_EQ(Image::infoOfEncodedBytes(file.bytes())->width, 6 / height);
         EXPECT_EQ(Image::infoOfEncodedBytes(file.bytes())->height, height);
     }
@@ -234,7 +234,7 @@ TEST(TIFFDecode, FilesOfAnotherEncoderShowTheSamePixels) {
 void expectNearElsewhere(const std::string& arguments, int difference) {
     SCOPED_TRACE(arguments);
     const auto tiff = encodedElsewhere(arguments, "a.tif");
-    const auto image = Image::fromEncodedBytes(tiff);
+    const auto image = decoded(tiff);
     const auto expected = rgbaDecodedElsewhere(tiff, "a.tif");
     ASSERT_TRUE(image.has_value());
     ASSERT_EQ(image->rgba().size(), expected.size());
@@ -329,7 +329,7 @@ TEST(TIFFDecode, NoSingleByteChangeDoesHarm) {
     }
     for (const auto& file : files) {
         forEverySingleByteChange(file, [](const Bytes& damaged) {
-            const auto image = Image::fromEncodedBytes(damaged);
+            const auto image = decoded(damaged);
             if (image) {
                 EXPECT_EQ(image->rgba().size(), std::size_t{4} * image->width() * image->height());
             }
@@ -389,9 +389,8 @@ TEST(TIFFDecode, DamagedFilesAreRefusedInSilence) {
     const auto lzw = encodedElsewhere("-size 9x11 plasma:fractal -depth 8 -compress LZW", "a.tif");
     const auto jpeg = encodedElsewhere("-size 9x11 plasma:fractal -depth 8 -compress JPEG", "a.tif");
     for (const auto& tiff : {lzw, jpeg}) {
-        const auto printed = printedBy([&tiff] {
-            forEverySingleByteChange(tiff, [](const Bytes& damaged) { Image::fromEncodedBytes(damaged); });
-        });
+        const auto printed =
+            printedBy([&tiff] { forEverySingleByteChange(tiff, [](const Bytes& damaged) { decoded(damaged); }); });
         EXPECT_EQ(printed, "");
     }
 }
@@ -406,7 +405,7 @@ TEST(TIFFDecode, TheHandlersOfAHostApplicationAreNeitherReplacedNorCalled) {
     const auto previousWarning = TIFFSetWarningHandler(hostHandler);
     const auto tiff = Image(4, 3, Bytes(48, 0x5A)).tiffRepresentation();
     expectNoImageFromAnyPrefix(tiff);
-    forEverySingleByteChange(tiff, [](const Bytes& damaged) { Image::fromEncodedBytes(damaged); });
+    forEverySingleByteChange(tiff, [](const Bytes& damaged) { decoded(damaged); });
     EXPECT_EQ(s_hostCalls, 0);
     EXPECT_EQ(TIFFSetErrorHandler(previousError), hostHandler);
     EXPECT_EQ(TIFFSetWarningHandler(previousWarning), hostHandler);

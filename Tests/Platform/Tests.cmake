@@ -4,6 +4,7 @@ find_package(TIFF REQUIRED)
 zulm_add_tests(PlatformTests
   AssertionReportTest
   DurableFileTest
+  EncodedImageCheckTest
   EncodedImageInfoTest
   FileLocationTest
   FileSystemTest

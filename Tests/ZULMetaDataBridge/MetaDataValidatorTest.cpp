@@ -223,10 +223,22 @@ struct Noticed {
     std::string bytes;
 };
 
-std::string largePicture() {
-    constexpr std::uint32_t side = 2048;
-    const Image image(side, side, std::vector<std::uint8_t>(std::size_t{4} * side * side, 0x55));
-    const auto png = BitmapImageRep::fromTIFF(image.tiffRepresentation())->pngRepresentation();
+std::string asTIFF(std::uint32_t width, std::uint32_t height) {
+    const Image image(width, height, std::vector<std::uint8_t>(std::size_t{4} * width * height, 0x55));
+    const auto tiff = image.tiffRepresentation();
+    return {tiff.begin(), tiff.end()};
+}
+
+/// A picture that has to be turned by a quarter takes its pixels twice.
+std::string turned(std::string tiff) {
+    const std::string orientation("\x12\x01\x03\x00\x01\x00\x00\x00", 8);
+    return tiff.replace(tiff.rfind(orientation) + orientation.size(), 1, 1, '\x06');
+}
+
+std::string asPNG(std::uint32_t width, std::uint32_t height) {
+    const std::string tiff = asTIFF(width, height);
+    const auto* bytes = reinterpret_cast<const std::uint8_t*>(tiff.data());
+    const auto png = BitmapImageRep::fromTIFF({bytes, tiff.size()})->pngRepresentation();
     return {png.begin(), png.end()};
 }
 
@@ -248,7 +260,12 @@ std::vector<Noticed> noticedFiles() {
         {"missing-pad@20", s_riff,
          riffMedia() + "ZULM" + le32(8 + 55) + "DATA" + le32(55) + streamHeader(s_unknown, 1, 31) + f64(1) +
              std::string(23, 'x')},
-        {"image-not-decoded@60", s_raw, images + cursorEntry(1, largePicture())},
+        {"image-not-decoded@60", s_raw, images + cursorEntry(1, turned(asTIFF(2048, 2048)))},
+        {"absurd-image@60", s_raw, images + cursorEntry(1, asPNG(2049, 1))},
+        {"absurd-image@60", s_raw, images + cursorEntry(1, asPNG(2000, 1000))},
+        {"absurd-image@60", s_raw, images + cursorEntry(1, std::string((32 << 20) + 1, 'x'))},
+        {"image-surplus@" + std::to_string(60 + asPNG(2, 1).size()), s_raw,
+         images + cursorEntry(1, asPNG(2, 1) + "further")},
         {"duplicate-stream@134", s_movie, media() + zulmAtom({locationStream(), locationStream()})},
         {"duplicate-stream@150", s_movie, media() + zulmAtom({locationStream()}) + zulmAtom({locationStream()})},
         {"wide-riff@0", s_riff, "RIFF" + le32(0) + "AVI " + zulmChunk({locationStream()})},
@@ -459,7 +476,7 @@ TEST(MetaDataValidator, AsksForNoMoreMemoryThanTwiceTheFileAnd16MiB) {
     std::string badTimes = streamHeader(s_cursorLocations, 1, 16);
     for (int i = 0; i < 200000; ++i)
         badTimes += pointEntry(s_noNumber, 0, 0);
-    const std::string images = streamHeader(s_images, 2, 0) + cursorEntry(1, largePicture());
+    const std::string images = streamHeader(s_images, 2, 0) + cursorEntry(1, asPNG(2048, 2048));
     const std::vector<std::pair<std::string, MetaDataParser::StreamType>> files{
         {tinyAtoms, s_movie},
         {extendedAtom("ZULM", tinyAtoms), s_movie},

@@ -40,6 +40,20 @@ std::string bytesOf(const Json& entry, const std::string& key) {
     return validText(bytes) == text ? bytes : text; // texts of ISO 8859-1 are whole already
 }
 
+/// The picture is checked and measured, but not decoded: a small file can claim a gigabyte of pixels.
+Json imageDocument(const CursorImage& stored) {
+    if (stored.imageDataSize == 0)
+        return nullptr;
+    EncodedImageCheck check;
+    if (stored.imageData)
+        check = Image::checkEncodedBytes({stored.imageData, stored.imageDataSize});
+    Json image{{s_damage, "cannot be decoded"}};
+    if (check.state != EncodedImageCheck::Undecodable)
+        image = {{"width", check.width}, {"height", check.height}};
+    image["bytes"] = stored.imageDataSize;
+    return image;
+}
+
 /// A value that is no text: an image as 32x32 (1234 bytes).
 std::string plain(const Json& value) {
     if (value.is_object() && value.contains(s_damage))
@@ -103,15 +117,7 @@ void EntryDocument::add(const char* key, double value) {
 }
 
 void EntryDocument::add(const char* key, const CursorImage& cursor) {
-    Json& image = document_[key] = nullptr;
-    if (cursor.imageDataSize == 0)
-        return;
-    const EntryValue decoded = entryImage(cursor);
-    if (const auto* pixels = std::get_if<std::shared_ptr<const Image>>(&decoded))
-        image = {{"width", (*pixels)->width()}, {"height", (*pixels)->height()}};
-    else
-        image = {{s_damage, "cannot be decoded"}};
-    image["bytes"] = cursor.imageDataSize;
+    document_[key] = imageDocument(cursor);
 }
 
 void EntryDocument::addText(const char* key, const std::string& text, const std::string& stored) {

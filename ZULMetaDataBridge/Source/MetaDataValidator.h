@@ -68,6 +68,8 @@ enum class FindingCode : std::size_t {
     WideRIFF,
     BeyondDuration,
     CursorWithoutImage,
+    AbsurdImage,
+    ImageSurplus,
 };
 
 /// What a code is called wherever it is shown, how bad it is, and what it means.
@@ -79,7 +81,7 @@ struct FindingRule {
 };
 
 /// By the numbers of their codes.
-inline constexpr std::array<FindingRule, 40> s_findingRules{{
+inline constexpr std::array<FindingRule, 42> s_findingRules{{
     {FindingCode::TrailingBytes, Severity::Damage, "trailing-bytes", "too few bytes for another atom or chunk"},
     {FindingCode::OpenEndedAtom, Severity::Damage, "open-ended-atom", "an atom without a size: nothing follows it"},
     {FindingCode::SizeMarker, Severity::Damage, "size-marker", "a 32-bit size that is neither a size nor the mark 1"},
@@ -121,6 +123,8 @@ inline constexpr std::array<FindingRule, 40> s_findingRules{{
     {FindingCode::WideRIFF, Severity::Notice, "wide-riff", "readers of 32-bit RIFF files do not find the metadata"},
     {FindingCode::BeyondDuration, Severity::Notice, "beyond-duration", "entries after the end of the movie"},
     {FindingCode::CursorWithoutImage, Severity::Notice, "cursor-without-image", "a cursor that had no picture before"},
+    {FindingCode::AbsurdImage, Severity::Notice, "absurd-image", "an image far larger than any cursor"},
+    {FindingCode::ImageSurplus, Severity::Notice, "image-surplus", "bytes after the end of an image"},
 }};
 
 static_assert(
@@ -128,7 +132,7 @@ static_assert(
         for (std::size_t i = 0; i < s_findingRules.size(); ++i)
             if (s_findingRules[i].code != static_cast<FindingCode>(i))
                 return false;
-        return static_cast<std::size_t>(FindingCode::CursorWithoutImage) + 1 == s_findingRules.size();
+        return static_cast<std::size_t>(FindingCode::ImageSurplus) + 1 == s_findingRules.size();
     }(),
     "one rule for every code, in their order");
 

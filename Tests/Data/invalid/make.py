@@ -111,13 +111,26 @@ def png_chunk(kind, body, sum_off_by=0):
     return be32(len(body)) + kind + body + be32((zlib.crc32(kind + body) + sum_off_by) & 0xFFFFFFFF)
 
 
-def png(width=2, height=1, sum_off_by=0):
-    """Two pixels, stored without compression so that every zlib makes the same bytes."""
-    rows = b"\0" + bytes([255, 0, 0, 255, 0, 255, 0, 128])
-    stored = b"\x78\x01\x01" + struct.pack("<HH", len(rows), len(rows) ^ 0xFFFF) + rows + be32(zlib.adler32(rows))
-    ihdr = be32(width) + be32(height) + bytes([8, 6, 0, 0, 0])
-    return (b"\x89PNG\r\n\x1a\n" + png_chunk(b"IHDR", ihdr) + png_chunk(b"IDAT", stored, sum_off_by) +
+def stored(rows):
+    """Without compression, so that every zlib makes the same bytes."""
+    return b"\x78\x01\x01" + struct.pack("<HH", len(rows), len(rows) ^ 0xFFFF) + rows + be32(zlib.adler32(rows))
+
+
+def png_file(width, height, depth, colour_type, pixels, sum_off_by=0):
+    ihdr = be32(width) + be32(height) + bytes([depth, colour_type, 0, 0, 0])
+    return (b"\x89PNG\r\n\x1a\n" + png_chunk(b"IHDR", ihdr) + png_chunk(b"IDAT", pixels, sum_off_by) +
             png_chunk(b"IEND", b""))
+
+
+def png(width=2, height=1, sum_off_by=0):
+    """Two pixels."""
+    rows = b"\0" + bytes([255, 0, 0, 255, 0, 255, 0, 128])
+    return png_file(width, height, 8, 6, stored(rows), sum_off_by)
+
+
+def grey_png(width, further_rows=0):
+    """A row of one bit a pixel."""
+    return png_file(width, 1, 1, 0, stored(b"\0" * (1 + width // 8) * (1 + further_rows)))
 
 
 LOCATIONS = header(LOCATION, 16) + point(0.5) + point(1.0)  # 56 bytes
@@ -422,6 +435,12 @@ def cursors():
             ("undecodable-image", image))
     invalid("cursor-image-too-many-pixels.dat", start + cursor(png(16384, 16384)),
             "77 bytes claim to be 16384 x 16384 pixels", ("undecodable-image", image))
+    invalid("cursor-image-far-too-wide.dat", start + cursor(grey_png(16384)),
+            "the image is 16384 pixels wide", ("absurd-image", image))
+    invalid("cursor-image-surplus.dat", start + cursor(picture + b"hidden"), "the image ends before its last 6 bytes",
+            ("image-surplus", image + len(picture)))
+    invalid("cursor-image-surplus-pixels.dat", start + cursor(grey_png(8, further_rows=1)),
+            "the image has compressed data after its last pixel", ("undecodable-image", image))
     invalid("cursor-image-tiff-cut-short.dat", start + cursor(b"II*\0" + le32(8) + b"\x01\0"),
             "a TIFF file of 10 bytes has no directory", ("undecodable-image", image))
     invalid("cursor-image-version-1-is-text.dat",

@@ -1,6 +1,5 @@
 #include "ZULMetaDataBridge/Source/Validation/StreamWalk.h"
 
-#include "Platform/Image.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/EntryTexts.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
@@ -29,6 +28,19 @@ constexpr std::size_t s_longestCharacter = 4;
 /// take beside twice the file, half is left to everything else.
 constexpr std::uint64_t memoryForImage(std::uint64_t total) {
     return 2 * total + (std::uint64_t{8} << 20);
+}
+
+/// No cursor is nearly as large. A whole image of more bytes is not even read.
+constexpr std::uint32_t s_largestCursorSide = 2048;
+constexpr std::uint32_t s_largestStoredImage = std::uint32_t{32} << 20;
+
+/// A cursor of ordinary size may be empty, and shrinks by any ratio. A larger picture that shrinks like this is no
+/// cursor.
+bool isAbsurd(const EncodedImageCheck& image, std::uint64_t size) {
+    constexpr std::uint64_t ordinarySize = std::uint64_t{1} << 20; // 512x512 pixels
+    constexpr std::uint64_t ordinaryRatio = 200;
+    return std::max(image.width, image.height) > s_largestCursorSide ||
+           (image.unpackedBytes > ordinarySize && image.unpackedBytes / ordinaryRatio > size);
 }
 
 /// Seconds. Movies count their duration in whole units, often of 1/600 or 1/1000 second.
@@ -281,14 +293,34 @@ void StreamWalk::checkImage(std::uint32_t size) {
     if (size == 0)
         return;
     const std::uint64_t offset = input_.position();
+    if (size > s_largestStoredImage) {
+        input_.moveTo(offset + size);
+        add(FindingCode::AbsurdImage, offset, "the image takes ", size,
+            " bytes, far more than a cursor: it was not read");
+        return;
+    }
     std::vector<std::uint8_t> encoded(size);
     input_.read(encoded.data(), size);
-    const auto info = Image::infoOfEncodedBytes(encoded);
-    if (info && info->decodingMemory + size > memoryForImage(input_.total()))
-        add(FindingCode::ImageNotDecoded, offset, "the image was not decoded: ", info->width, "x", info->height,
-            " pixels are too large for a file of this size");
-    else if (!info || !Image::fromEncodedBytes(encoded))
+    reportImage(offset, size, Image::checkEncodedBytes(encoded, memoryForImage(input_.total()) - size));
+}
+
+void StreamWalk::reportImage(std::uint64_t offset, std::uint32_t size, const EncodedImageCheck& check) {
+    const bool isUnpacked = check.state != EncodedImageCheck::NotUnpacked;
+    if (check.state == EncodedImageCheck::Undecodable && check.surplusBytes > 0)
+        add(FindingCode::UndecodableImage, offset, "the image of ", size,
+            " bytes cannot be decoded: ", check.surplusBytes, " of them follow its last pixel");
+    else if (check.state == EncodedImageCheck::Undecodable)
         add(FindingCode::UndecodableImage, offset, "the image of ", size, " bytes cannot be decoded");
+    else if (isAbsurd(check, size))
+        add(FindingCode::AbsurdImage, offset, "the image of ", size, " bytes claims ", check.width, "x", check.height,
+            " pixels, which unpack to ", check.unpackedBytes, " bytes, far more than a cursor",
+            isUnpacked ? "" : "; they were not unpacked");
+    else if (!isUnpacked)
+        add(FindingCode::ImageNotDecoded, offset, "the image was not decoded: ", check.width, "x", check.height,
+            " pixels are too large for a file of this size");
+    if (check.state != EncodedImageCheck::Undecodable && check.surplusBytes > 0)
+        add(FindingCode::ImageSurplus, offset + size - check.surplusBytes, "the image ends before the last ",
+            check.surplusBytes, " of its ", size, " bytes");
 }
 
 void StreamWalk::checkText(std::uint64_t size) {

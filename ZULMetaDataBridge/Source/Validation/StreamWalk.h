@@ -2,6 +2,7 @@
 
 // Validates one stream: its header, then its entries by the layout of its kind.
 
+#include "Platform/Image.h"
 #include "ZULMetaData/CursorImageSchema.h"
 #include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 #include "ZULMetaDataBridge/Source/Validation/FindingLog.h"
@@ -69,6 +70,7 @@ private:
     bool checkCursorImage(const Entry& entry);
     bool checkCursorData(const Entry& entry, const CursorImageSchema& schema, Record& record);
     void checkImage(std::uint32_t size);
+    void reportImage(std::uint64_t offset, std::uint32_t size, const EncodedImageCheck& check);
     void checkText(std::uint64_t size);
     void noteTime(std::uint64_t entryStart, double time);
     void noteCursor(std::uint64_t entryStart, std::uint64_t identifier, bool hasImage);
