@@ -185,7 +185,9 @@ py::array readEntries(const StreamSource& source) {
     const StreamSource::Bytes stream = source.open();
     const std::optional<MetaDataHeader> header = StreamEntries(stream.read, stream.length).header();
     if (!header || !isDecodable(*header))
-        throwValueError(source.name() + ": a stream of a version that this library does not know");
+        throwValueError(source.name() +
+                        ": the entries cannot be decoded: the version of the stream is not known, or its "
+                        "header does not state the entry size of its kind");
     py::array array;
     RecordedKinds::visit(header->uuid, [&]<class Kind>() { array = entriesOfKind<Kind>(stream); });
     return array;

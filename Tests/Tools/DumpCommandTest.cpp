@@ -416,5 +416,14 @@ TEST_F(DumpCommand, NeedsNoMoreMemoryForMoreEntries) {
     EXPECT_LT(memoryFor(200000) - few, 4096);
 }
 
+TEST_F(DumpCommand, DecodesNoEntriesOfAnotherSizeThanTheirKindHas) {
+    const std::string points = streamHeader("2b7b6af6", 1, 16) + std::string(1600, 'x'); // of regions: 24 bytes each
+    const ToolResult result = run({"--format", "ndjson", written("stream.dat", points)});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_EQ(result.output, "");
+    EXPECT_THAT(result.errors, HasSubstr("entries of recordingRegion, version 1, cannot be decoded: at offset 20: the "
+                                         "header says that entries take 16 bytes, but those of this kind take 24"));
+}
+
 } // namespace
 } // namespace ZULMetaData::Test

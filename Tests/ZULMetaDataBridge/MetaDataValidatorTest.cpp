@@ -215,6 +215,17 @@ TEST(MetaDataValidator, ShowsTypesThatCannotBePrintedByTheirNumbers) {
     EXPECT_EQ(findings[0].place, "\\x00A\\xff~");
 }
 
+TEST(MetaDataValidator, ReadsNoEntriesOfAnotherSizeThanTheirKindHas) {
+    std::string points = streamHeader("2b7b6af6", 1, 16); // of regions, which take 24 bytes
+    for (int i = 0; i < 2400; ++i)
+        points += pointEntry(i, 2, 3);
+    const ValidationReport report = validated(points, s_raw);
+    EXPECT_EQ(findingsOf(report), "entry-size-mismatch@20");
+    EXPECT_EQ(report.streams.at(0).wholeEntries, 0U);
+    EXPECT_EQ(report.streams.at(0).readableBytes, 24U);
+    EXPECT_EQ(report.streams.at(0).firstTime, std::nullopt);
+}
+
 // ---- notices ----
 
 struct Noticed {

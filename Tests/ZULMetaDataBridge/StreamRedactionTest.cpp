@@ -242,10 +242,12 @@ TEST(StreamRedaction, LeavesOutATornTailAndWhatDoesNotFit) {
     EXPECT_EQ(misfit.result.bytesLeftOut, 8U + 18U);
 }
 
-TEST(StreamRedaction, WritesTheEntrySizeThatReadersGoBy) {
-    const std::string entries = pointEntry(1, 2, 3);
-    EXPECT_EQ(redacted(streamHeader(s_cursorLocations, 1, 0) + entries, {}).bytes,
-              streamHeader(s_cursorLocations, 1, 16) + entries);
+TEST(StreamRedaction, LooksIntoNoStreamWhoseHeaderStatesAnotherEntrySizeThanItsKindHas) {
+    const std::string points = streamHeader("2b7b6af6", 1, 16) + pointEntry(1, 2, 3) + pointEntry(2, 3, 4);
+    EXPECT_EQ(redacted(points, {}).bytes, points);
+    Redaction range;
+    range.removedTimes.push_back({0, 1});
+    EXPECT_EQ(redacted(points, range).result.removal, RedactedStream::Undecodable);
 }
 
 TEST(StreamRedaction, LeavesOutWhatHasNoHeader) {

@@ -124,6 +124,16 @@ TEST(StreamSalvage, FindsStreamsBehindADataAtomThatCountsATornTail) {
     EXPECT_TRUE(streams[1].isCutShort);
 }
 
+TEST(StreamSalvage, KeepsEveryByteOfAReachableStreamWhoseEntriesAreOfAnotherSize) {
+    const std::string file = media() + zulmAtom({scaleStream(2), locationStream()});
+    const auto streams = salvaged(file);
+    ASSERT_EQ(streams.size(), 2U);
+    EXPECT_EQ(bytesOf(file, streams[0]), locationStream());
+    EXPECT_EQ(bytesOf(file, streams[1]), scaleStream(2));
+    EXPECT_EQ(streams[1].entries, 0U);
+    EXPECT_FALSE(streams[1].isCutShort);
+}
+
 TEST(StreamSalvage, FindsATornStreamOfTextsUpToTheNextOne) {
     const std::string torn = be32(1) + "DATA" + be64(16 + 56 + 9) + appNameStream();
     const std::string file = media() + extendedAtom("ZULM", torn + extendedAtom("DATA", locationStream()));

@@ -125,8 +125,10 @@ ExitCode dumpStream(Recording& recording, const DumpOptions& options, Printout& 
         return code;
     if (!isDecoded) {
         printout.beginStream(stream, nullptr, isOnlyOne);
-        warn(fmt::format("{}: entries of {}, version {}, cannot be decoded", recording.name(),
-                         metaDataKindName(stream.type), stream.version));
+        warn(fmt::format("{}: entries of {}, version {}, cannot be decoded{}", recording.name(),
+                         metaDataKindName(stream.type), stream.version,
+                         stream.damage.empty() ? std::string() : ": " + stream.damage));
+        code = stream.damage.empty() ? ExitFine : ExitDamaged;
     }
     printout.endStream();
     return code;

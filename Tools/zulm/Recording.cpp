@@ -1,5 +1,7 @@
 #include "Tools/zulm/Recording.h"
 
+#include "ZULMetaDataBridge/Source/KindEntries.h"
+
 #include <fmt/core.h>
 
 #include <algorithm>
@@ -24,10 +26,8 @@ std::string damageIn(const StreamReport& stream) {
 
 /// Fills in what walking the stream has told.
 void examine(StreamInfo& info, const StreamReport& report) {
-    const MetaDataKind* kind = findMetaDataKind(info.type);
     info.version = report.version;
-    info.isDecodable = kind && info.version >= 1 && info.version <= kind->currentVersion &&
-                       RecordedKinds::visit(info.type, []<class Kind>() {});
+    info.isDecodable = isDecodable({info.type, report.version, report.fixedEntrySize});
     info.entries = report.wholeEntries;
     info.firstTime = report.firstTime;
     info.lastTime = report.lastTime;

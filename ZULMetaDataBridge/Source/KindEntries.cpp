@@ -6,25 +6,26 @@
 
 namespace ZULMetaData {
 
-bool isDecodable(const MetaDataHeader& header) {
+bool isKnownStream(const MetaDataHeader& header) {
     const MetaDataKind* kind = findMetaDataKind(header.uuid);
-    return kind && header.version >= 1 && header.version <= kind->currentVersion &&
+    return kind && header.version >= 1 && header.version <= kind->currentVersion;
+}
+
+bool isDecodable(const MetaDataHeader& header) {
+    return isKnownStream(header) && header.fixedEntrySize == entrySizeOf(header) &&
            RecordedKinds::visit(header.uuid, []<class Kind>() {});
 }
 
 std::uint32_t entrySizeOf(const MetaDataHeader& header) {
     std::uint32_t size = header.fixedEntrySize;
-    if (isDecodable(header))
+    if (isKnownStream(header))
         RecordedKinds::visit(header.uuid,
                              [&size]<class Kind>() { size = metaDataFixedEntrySize<typename Kind::Value>(); });
     return size;
 }
 
 StreamEntries entriesOf(ReadBytes read, std::uint64_t length) {
-    StreamEntries entries(std::move(read), length);
-    if (entries.header())
-        entries.setEntrySize(entrySizeOf(*entries.header()));
-    return entries;
+    return {std::move(read), length};
 }
 
 std::optional<double> timeOfEntry(const MetaDataHeader& header, std::string_view bytes) {

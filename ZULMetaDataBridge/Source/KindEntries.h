@@ -12,14 +12,18 @@
 
 namespace ZULMetaData {
 
-/// Returns whether entries of this kind and version can be decoded.
+/// Returns true if the kind of the stream is registered, and its version is one of those that are registered.
+ZULMETADATA_API bool isKnownStream(const MetaDataHeader& header);
+
+/// Returns true if the entries of the stream can be decoded here: its kind is one that is recorded, its version is
+/// known, and its header states the entry size of that kind.
 ZULMETADATA_API bool isDecodable(const MetaDataHeader& header);
 
-/// Returns the size of every entry in bytes, or 0 if each entry has its own size. Readers use the size that the kind
-/// determines, whatever the header says; only if the stream cannot be decoded, the size is the one in the header.
+/// Returns the size of each entry in bytes for the stream's kind, whatever the header states; 0 if they vary. If the kind is not
+/// recorded or the version is not known, returns what the header states.
 ZULMETADATA_API std::uint32_t entrySizeOf(const MetaDataHeader& header);
 
-/// Returns the entries of a stream, divided as readers of its kind divide them.
+/// Returns the entries as the header divides them. Each is decoded by its kind only if `isDecodable`.
 ZULMETADATA_API StreamEntries entriesOf(ReadBytes read, std::uint64_t length);
 
 /// Returns the time of an entry in seconds. It is empty if the entry does not fit its kind or cannot be decoded.

@@ -237,8 +237,7 @@ RedactedStream::Removal removalOf(const std::optional<MetaDataHeader>& header, c
     return isLegible ? RedactedStream::Kept : RedactedStream::Undecodable;
 }
 
-void writeHeader(MetaDataHeader header, std::ostream& out) {
-    header.fixedEntrySize = entrySizeOf(header); // the size that readers of its kind go by, whatever the header said
+void writeHeader(const MetaDataHeader& header, std::ostream& out) {
     out.write(reinterpret_cast<const char*>(&header), sizeof header);
 }
 

@@ -68,8 +68,8 @@ bool canBeHeader(const MetaDataHeader& header) {
     const MetaDataKind* kind = findMetaDataKind(header.uuid);
     if (!kind || header.version < 1 || header.version > kind->currentVersion)
         return false;
-    if (isDecodable(header))
-        return header.fixedEntrySize == entrySizeOf(header);
+    if (RecordedKinds::visit(header.uuid, []<class Kind>() {}))
+        return isDecodable(header);
     constexpr std::array sizes{0U, unsigned{sizeof(double) + sizeof(int)}, unsigned{sizeof(double) + sizeof(Point)},
                                unsigned{sizeof(double) + sizeof(Rect)}};
     return std::find(sizes.begin(), sizes.end(), header.fixedEntrySize) != sizes.end();
@@ -262,7 +262,7 @@ bool StreamSalvage::measure(std::size_t index) {
     }
     stream.isCutShort |= stream.declaredBytes && stream.bytes < *stream.declaredBytes;
     const bool isEmpty = stream.declaredBytes == s_metaDataHeaderSize;
-    const bool isKnownPlace = stream.origin == SalvagedStream::Reachable && isDecodable(stream.header);
+    const bool isKnownPlace = stream.origin == SalvagedStream::Reachable && isKnownStream(stream.header);
     return stream.entries > 0 || isEmpty || isKnownPlace;
 }
 
@@ -284,6 +284,10 @@ void StreamSalvage::walk(SalvagedStream& stream, std::uint64_t limit) const {
     StreamEntries entries = entriesOf(readingBehind(read_, stream.offset), limit - stream.offset);
     stream.bytes = std::min<std::uint64_t>(s_metaDataHeaderSize, limit - stream.offset);
     stream.entries = 0;
+    if (stream.origin == SalvagedStream::Reachable && stream.header.fixedEntrySize != entrySizeOf(stream.header)) {
+        stream.bytes = limit - stream.offset; // its entries cannot be told apart, but none of them is lost
+        return;
+    }
     while (const auto entry = entries.next()) {
         if (!stream.declaredBytes && !canBeEntry(stream.header, entries.bytesOf(*entry)))
             return;

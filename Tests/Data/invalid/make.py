@@ -295,7 +295,7 @@ def headers():
     invalid("header-entry-size-of-image.dat", header(IMAGE, 32, 2) + cursor(), "cursor images have no fixed size",
             ("entry-size-mismatch", 20), ("cursor-without-image", 24))
     invalid("header-scale-as-double.dat", header(SCALE, 16) + seconds(0.0) + seconds(2.0),
-            "the scale factor is an integer, not a 64-bit float", ("entry-size-mismatch", 20), ("torn-entry", 36))
+            "the scale factor is an integer, not a 64-bit float", ("entry-size-mismatch", 20))
     invalid("header-unknown-kind-without-time.dat", header(STRANGE, 7) + b"1234567",
             "entries of 7 bytes have no space for their time, whatever their kind is", ("entry-size-mismatch", 20),
             ("unknown-kind", 0))
@@ -435,10 +435,6 @@ def cursors():
             ("undecodable-image", image))
     invalid("cursor-image-too-many-pixels.dat", start + cursor(png(16384, 16384)),
             "77 bytes claim to be 16384 x 16384 pixels", ("undecodable-image", image))
-    invalid("cursor-image-far-too-wide.dat", start + cursor(grey_png(16384)),
-            "the image is 16384 pixels wide", ("absurd-image", image))
-    invalid("cursor-image-surplus.dat", start + cursor(picture + b"hidden"), "the image ends before its last 6 bytes",
-            ("image-surplus", image + len(picture)))
     invalid("cursor-image-surplus-pixels.dat", start + cursor(grey_png(8, further_rows=1)),
             "the image has compressed data after its last pixel", ("undecodable-image", image))
     invalid("cursor-image-tiff-cut-short.dat", start + cursor(b"II*\0" + le32(8) + b"\x01\0"),

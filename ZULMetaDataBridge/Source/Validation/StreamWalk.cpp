@@ -92,17 +92,20 @@ bool StreamWalk::isVersionKnown() {
     return kind && report_.version >= 1 && report_.version <= kind->currentVersion;
 }
 
-void StreamWalk::checkFixedEntrySize(std::uint32_t expected) {
-    if (report_.fixedEntrySize != expected)
+bool StreamWalk::hasEntriesOf(std::uint32_t expected) {
+    const bool isSo = report_.fixedEntrySize == expected;
+    if (!isSo)
         add(FindingCode::EntrySizeMismatch, report_.offset + offsetof(MetaDataHeader, fixedEntrySize),
             "the header says that entries take ", report_.fixedEntrySize, " bytes, but those of this kind take ",
-            expected, expected == 0 ? " (each carries its own size)" : "");
+            expected, expected == 0 ? " (each carries its own size)" : "", ": they were not read");
+    return isSo;
 }
 
 template <class Kind>
 void StreamWalk::walkKind() {
     using Value = typename Kind::Value;
-    checkFixedEntrySize(metaDataFixedEntrySize<Value>());
+    if (!hasEntriesOf(metaDataFixedEntrySize<Value>()))
+        return;
     if constexpr (FixedSizeValue<Value>) {
         walkFixed(metaDataFixedEntrySize<Value>());
     } else if constexpr (std::same_as<Value, std::string>) {

@@ -50,7 +50,7 @@ private:
 
     bool readHeader();
     bool isVersionKnown();
-    void checkFixedEntrySize(std::uint32_t expected);
+    bool hasEntriesOf(std::uint32_t expected);
 
     template <class Kind>
     void walkKind();
