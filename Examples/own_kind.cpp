@@ -46,7 +46,9 @@ int main(int count, char** arguments) {
         const FileLocation movie = arguments[1];
         const FileLocation file = movie.parent_path() / "heartRate.dat";
         record(file);
-        SafeMovieSave(movie).attach({StreamSource::file(file)});
+        // A kind of one's own is not registered, so that it must be asked for.
+        SafeMovieSave(movie).attach({StreamSource::file(file)}, SafeMovieSave::Existing::Refuse,
+                                    SafeMovieSave::Sources::Unchecked);
         read(movie);
     } catch (const std::exception& error) {
         std::cerr << error.what() << '\n';

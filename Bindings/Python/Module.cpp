@@ -107,11 +107,12 @@ std::vector<StreamSource> sourcesOf(const py::iterable& streams) {
     return sources;
 }
 
-AttachResult attach(const FileLocation& movie, const py::iterable& streams, bool replace) {
+AttachResult attach(const FileLocation& movie, const py::iterable& streams, bool replace, bool unchecked) {
     const std::vector<StreamSource> sources = sourcesOf(streams);
     const py::gil_scoped_release others;
     return SafeMovieSave(movie).attach(sources,
-                                       replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse);
+                                       replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse,
+                                       unchecked ? SafeMovieSave::Sources::Unchecked : SafeMovieSave::Sources::Checked);
 }
 
 CreatorAttributes stamp(const FileLocation& movie, const py::object& creator, const py::object& version) {
@@ -141,6 +142,7 @@ const char* reasonOf(const SaveError& error) {
     switch (error.reason()) {
     case SaveError::Reason::Failed: return "failed";
     case SaveError::Reason::KindExists: return "kind-exists";
+    case SaveError::Reason::Doubtful: return "doubtful";
     case SaveError::Reason::NotUndone: break;
     }
     return "not-undone";
@@ -330,7 +332,7 @@ void addSaving(py::module_& module) {
         .def("__repr__", [](const AttachResult& attached) {
             return py::str("<Attached streams={} repair={}>").format(attached.streams.size(), stateOf(attached.repair));
         });
-    module.def("attach", attach, py::arg("movie"), py::arg("streams"), py::arg("replace"));
+    module.def("attach", attach, py::arg("movie"), py::arg("streams"), py::arg("replace"), py::arg("unchecked"));
     module.def("stamp", stamp, py::arg("movie"), py::arg("creator"), py::arg("version"));
 }
 

@@ -137,14 +137,15 @@ TEST_F(AttachCommand, TakesWhatIsWholeOfHostileStreams) {
     };
     for (const auto& [what, bytes] : hostile) {
         SCOPED_TRACE(what);
-        const ToolResult result = runTool({"attach", plain, stream("a.dat", bytes), "-o", out, "--force"});
+        const ToolResult result =
+            runTool({"attach", plain, stream("a.dat", bytes), "-o", out, "--force", "--unchecked"});
         EXPECT_EQ(result.exitCode, 3) << result.errors;
         EXPECT_EQ(contentsOf(out), tinyMovie() + zulmAtom({bytes.substr(0, 24)}));
     }
 }
 
 TEST_F(AttachCommand, RefusesFilesThatAreNoStreams) {
-    for (const std::size_t length : {0U, 1U, 23U}) {
+    for (const std::size_t length : {1U, 23U}) {
         const ToolResult result = runTool({"attach", plain, stream("a.dat", std::string(length, 'x')), "-o", out});
         EXPECT_EQ(result.exitCode, 1);
         EXPECT_THAT(result.errors, HasSubstr("a.dat: too short for a stream"));
@@ -176,12 +177,48 @@ TEST_F(AttachCommand, ExaminesTheStreamsBeforeItCopiesTheMovie) {
     EXPECT_FALSE(std::filesystem::exists(out));
 }
 
-TEST_F(AttachCommand, WarnsOfAKindThatNobodyKnows) {
-    const std::string unknown = stream("a.dat", std::string(16, 'u') + le32(1) + le32(4) + "data");
-    const ToolResult result = runTool({"attach", plain, unknown, "-o", out});
-    EXPECT_EQ(result.exitCode, 0);
-    EXPECT_THAT(result.errors, HasSubstr("75757575-7575-7575-7575-757575757575 is no kind that is known here"));
+TEST_F(AttachCommand, RefusesWhatIsNoStreamOfAKnownKindUnlessItIsAskedFor) {
+    const std::map<std::string, std::string> doubtful{
+        {std::string(16, 'u') + le32(1) + le32(4) + "data",
+         "is no stream of a known kind: its header begins with the identifier 75757575-7575-7575-7575-757575757575"},
+        {tinyMovie(), "is no stream of a known kind"},
+        {streamHeader(s_cursorLocations, 9, 16) + pointEntry(0.5, 1, 2),
+         "is a stream of the kind cursorLocation in version 9, which is not known: the last known one is 1"},
+        {locationStream().substr(0, 30), "has 6 bytes after its header, but not one whole entry"},
+    };
+    for (const auto& [bytes, message] : doubtful) {
+        SCOPED_TRACE(message);
+        const std::string file = stream("a.dat", bytes);
+        const ToolResult result = runTool({"attach", plain, file, "-o", out});
+        EXPECT_EQ(result.exitCode, 1);
+        EXPECT_THAT(result.errors, HasSubstr(file + ": " + message));
+        EXPECT_THAT(result.errors, HasSubstr("; --unchecked attaches it as it is; nothing was written"));
+        EXPECT_FALSE(std::filesystem::exists(out));
+        EXPECT_THAT(runTool({"attach", plain, file, "-o", out, "--unchecked"}).exitCode, testing::AnyOf(0, 3));
+        EXPECT_EQ(streamsIn(out).size(), 1U);
+        std::filesystem::remove(out);
+    }
+    EXPECT_EQ(runTool({"attach", plain, stream("a.dat", locationStream().substr(0, 24)), "-o", out}).exitCode, 0);
+}
+
+TEST_F(AttachCommand, CarriesUnknownStreamsOfAnotherMovieOver) {
+    const std::string unknown = std::string(16, 'u') + le32(1) + le32(4) + "data";
+    const std::string old = stream("Old.mp4", media() + zulmAtom({unknown}));
+    EXPECT_EQ(runTool({"attach", plain, "--from", old, "-o", out}).exitCode, 0);
     EXPECT_EQ(streamsIn(out).size(), 1U);
+}
+
+TEST_F(AttachCommand, LeavesEmptyStreamFilesOutAndSaysSo) {
+    const std::string empty = stream("empty.dat", "");
+    const ToolResult result = runTool({"attach", plain, empty, stream("a.dat", locationStream()), "-o", out, "--json"});
+    EXPECT_EQ(result.exitCode, 3);
+    EXPECT_THAT(result.errors, HasSubstr(empty + ": is empty, as nothing was recorded into it; it was left out"));
+    EXPECT_EQ(nlohmann::json::parse(result.output).at("files").at(0).at("left_out").at(0), empty);
+    EXPECT_EQ(contentsOf(out), tinyMovie() + zulmAtom({locationStream()}));
+    const ToolResult alone = runTool({"attach", plain, empty, "-o", folder / "None.mp4"});
+    EXPECT_EQ(alone.exitCode, 3);
+    EXPECT_THAT(alone.errors, HasSubstr("there is no stream to attach; nothing was written"));
+    EXPECT_FALSE(std::filesystem::exists(folder / "None.mp4"));
 }
 
 TEST_F(AttachCommand, RefusesASecondStreamOfAKindUnlessItMayReplace) {

@@ -239,6 +239,36 @@ TEST_F(SafeSave, RefusesMoviesThatAreNone) {
     EXPECT_THAT(refusal([&] { SafeMovieSave(movie).repair(); }), HasSubstr("declares 100 bytes"));
 }
 
+TEST_F(SafeSave, RefusesDoubtfulSourcesUnlessTheyAreAskedFor) {
+    const std::map<std::string, std::string> doubtful{
+        {"is no stream of a known kind", media() + std::string(1000, 'm')},
+        {"in version 0, which is not known: the last known one is 1",
+         streamHeader(s_cursorLocations, 0, 16) + pointEntry(1, 2, 3)},
+        {"has 15 bytes after its header, but not one whole entry",
+         streamHeader(s_cursorLocations, 1, 16) + std::string(15, 'x')},
+        {"has 4 bytes after its header, but not one whole entry", streamHeader(s_appNames, 1, 0) + le32(0)},
+    };
+    for (const auto& [sentence, bytes] : doubtful) {
+        SCOPED_TRACE(sentence);
+        writeFile(movie, media());
+        const auto source = sources({stream("a.dat", bytes)});
+        EXPECT_THAT(refusal([&] { SafeMovieSave(movie).attach(source); }), HasSubstr(sentence));
+        EXPECT_THAT(refusal([&] { SafeMovieSave(movie).checkAttach(source); }), HasSubstr(sentence));
+        try {
+            SafeMovieSave(movie).attach(source);
+        } catch (const SaveError& error) {
+            EXPECT_EQ(error.reason(), SaveError::Reason::Doubtful);
+        }
+        SafeMovieSave(movie).attach(source, SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Unchecked);
+        EXPECT_EQ(streamCount(), 1U);
+    }
+    for (const std::string& empty : {streamHeader(s_cursorLocations, 1, 16), streamHeader("2b7b6aef", 1, 16)}) {
+        writeFile(movie, media());
+        SafeMovieSave(movie).attach(sources({stream("a.dat", empty)}));
+        EXPECT_EQ(contentsOf(movie), media() + zulmAtom({empty}));
+    }
+}
+
 TEST_F(SafeSave, CutsHostileStreamsDownToWhatIsWhole) {
     const std::map<std::string, std::string> hostile{
         {"an entry of size 0", streamHeader(s_appNames, 1, 0) + textEntry(0.5, "Abc") + le32(0) + "rest"},
@@ -252,7 +282,8 @@ TEST_F(SafeSave, CutsHostileStreamsDownToWhatIsWhole) {
         EXPECT_EQ(contentsOf(movie), media() + zulmAtom({bytes.substr(0, 39), locationStream()}));
     }
     writeFile(movie, media());
-    SafeMovieSave(movie).attach(sources({stream("a.dat", streamHeader(s_cursorLocations, 1, 0xffffffff) + "rest")}));
+    SafeMovieSave(movie).attach(sources({stream("a.dat", streamHeader(s_cursorLocations, 1, 0xffffffff) + "rest")}),
+                                SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Unchecked);
     EXPECT_EQ(contentsOf(movie), media() + zulmAtom({streamHeader(s_cursorLocations, 1, 0xffffffff)}));
 }
 
@@ -555,7 +586,8 @@ TEST_F(SafeSave, KeepsASizeThatIsNotThereAwayFromReaders) {
     ASSERT_EQ(read.values.size(), 1U);
     EXPECT_EQ(read.values[0].size(), huge - 8) << "the reader believes it";
     writeFile(movie, media());
-    SafeMovieSave(movie).attach({StreamSource::memory(hostile, "hostile")});
+    SafeMovieSave(movie).attach({StreamSource::memory(hostile, "hostile")}, SafeMovieSave::Existing::Refuse,
+                                SafeMovieSave::Sources::Unchecked);
     Entries<std::string> attached;
     MetaDataParser::create(movie)->loadDataType<std::string>(kind(s_appNames), attached, -1);
     EXPECT_TRUE(attached.values.empty());
@@ -616,7 +648,8 @@ long peakMemoryInKilobytes() {
 TEST_F(SafeSave, SaysWhereTheIndexOfFragmentsIs) {
     const auto attach = [&](SafeMovieSave::FragmentIndex index) {
         return SafeMovieSave(movie)
-            .attach({StreamSource::memory(locationStream(), "stream")}, SafeMovieSave::Existing::Refuse, index)
+            .attach({StreamSource::memory(locationStream(), "stream")}, SafeMovieSave::Existing::Refuse,
+                    SafeMovieSave::Sources::Checked, index)
             .fragmentIndex;
     };
     writeFile(movie, media());
@@ -633,7 +666,7 @@ TEST_F(SafeSave, MovesTheIndexOfFragmentsToTheEnd) {
     for (const std::string& index : {atom("mfra", "index"), extendedAtom("mfra", std::string(1 << 19, 'i'))}) {
         writeFile(movie, media() + index);
         SafeMovieSave(movie).attach({StreamSource::memory(locationStream(), "stream")}, SafeMovieSave::Existing::Refuse,
-                                    SafeMovieSave::FragmentIndex::MoveToEnd);
+                                    SafeMovieSave::Sources::Checked, SafeMovieSave::FragmentIndex::MoveToEnd);
         std::string blank = index;
         blank.replace(4, 4, "free");
         EXPECT_EQ(contentsOf(movie), media() + blank + zulmAtom({locationStream()}) + index);
@@ -646,7 +679,7 @@ TEST_F(SafeSave, IsWhatItWasWhereverAMoveOfTheIndexFails) {
     for (const std::uint64_t limit : {whole.size() + 10, whole.size() + 100, whole.size() + 2000}) {
         const FileSizeLimit limited(limit);
         EXPECT_THROW(SafeMovieSave(movie).attach({StreamSource::memory(locationStream(), "stream")},
-                                                 SafeMovieSave::Existing::Refuse,
+                                                 SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Checked,
                                                  SafeMovieSave::FragmentIndex::MoveToEnd),
                      SaveError);
         EXPECT_EQ(contentsOf(movie), whole) << limit;

@@ -11,6 +11,7 @@ zulm_add_tests(ZULMetaDataBridgeTests
   MediaFilesTest
   MetaDataExcerptTest
   ParserFamilyTest
+  RecordingRedactionTest
   SafeMovieSaveTest
   StreamRedactionTest
   StreamRetimingTest

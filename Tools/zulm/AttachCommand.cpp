@@ -31,13 +31,16 @@ struct AttachOptions {
     TimeOptions times;
     bool replace = false;
     bool movesIndex = false;
+    bool unchecked = false;
     bool json = false;
 };
 
 /// What is to be attached, and whether something of it is lost already.
 struct Streams {
     std::vector<StreamSource> sources;
-    std::set<uuid> types; ///< of the stream files
+    std::vector<StreamSource> files; ///< those of the sources that are stream files
+    std::vector<std::string> empty;  ///< stream files that were left out
+    std::set<uuid> types;            ///< of the stream files
     ExitCode code = ExitFine;
 };
 
@@ -57,10 +60,15 @@ uuid typeOfStreamFile(const std::string& path) {
 void takeStreamFiles(const AttachOptions& options, Streams& streams) {
     for (const std::string& path : options.streams) {
         const uuid type = typeOfStreamFile(path);
-        if (!findMetaDataKind(type))
-            warn(fmt::format("{}: {} is no kind that is known here; it is attached as it is", path, uuidText(type)));
+        if (Recording(path).size() == 0) {
+            complain(fmt::format("{}: is empty, as nothing was recorded into it; it was left out", path));
+            streams.empty.push_back(path);
+            streams.code = ExitDamaged;
+            continue;
+        }
         streams.types.insert(type);
         streams.sources.push_back(StreamSource::file(path));
+        streams.files.push_back(streams.sources.back());
     }
 }
 
@@ -153,7 +161,7 @@ struct TimesOutside {
 };
 
 Json fileDocument(const AttachOptions& options, const std::string& name, const AttachResult& attached,
-                  const TimesOutside& times) {
+                  const TimesOutside& times, const Streams& streams) {
     Json file = fileHeader(options.save.movie);
     addText(file, "output", name);
     file.update(Json{{"repair", repairDocument(attached.repair)},
@@ -163,6 +171,8 @@ Json fileDocument(const AttachOptions& options, const std::string& name, const A
                      {"streams", Json::array()}});
     for (const auto& stream : attached.streams)
         file["streams"].push_back(streamDocument(stream));
+    for (const std::string& path : streams.empty)
+        file["left_out"].push_back(validText(path));
     return file;
 }
 
@@ -180,9 +190,11 @@ ExitCode complainAboutCuts(const AttachResult& attached) {
 }
 
 ExitCode complainAboutNoStreams(const AttachOptions& options, ExitCode code) {
-    const std::string& name = options.from.empty() ? options.streams.front() : options.from;
-    complain(fmt::format("{}: {}; nothing was written", name,
-                         code == ExitFine ? "no recording metadata in it" : "no stream in it can be carried over"));
+    if (options.from.empty())
+        complain("there is no stream to attach; nothing was written");
+    else
+        complain(fmt::format("{}: {}; nothing was written", options.from,
+                             code == ExitFine ? "no recording metadata in it" : "no stream in it can be carried over"));
     return worseOf(code, ExitNoMetaData);
 }
 
@@ -201,15 +213,20 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     if (retimed.sources().empty())
         return complainAboutNoStreams(options, ExitDamaged);
     const auto existing = options.replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse;
+    using Sources = SafeMovieSave::Sources;
     const auto index =
         options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd : SafeMovieSave::FragmentIndex::Leave;
-    movie.examine([&](const SafeMovieSave& save) { save.checkAttach(retimed.sources(), existing); });
+    movie.examine([&](const SafeMovieSave& save) {
+        if (!streams.files.empty() && !options.unchecked)
+            save.checkAttach(streams.files, existing);
+        save.checkAttach(retimed.sources(), existing, Sources::Unchecked);
+    });
     const AttachResult attached = movie.save("attaching to " + movie.name(), [&](const SafeMovieSave& save) {
-        return save.attach(retimed.sources(), existing, index);
+        return save.attach(retimed.sources(), existing, Sources::Unchecked, index);
     });
     const TimesOutside times{warnOfTimesOutside(movie.name(), duration, retimed.sources()), retimed.entriesRemoved()};
     if (report.isWanted())
-        report.add(fileDocument(options, movie.name(), attached, times));
+        report.add(fileDocument(options, movie.name(), attached, times, streams));
     else if (!settings().quiet)
         print(movie.name(), attached);
     warnOfFragmentIndex(movie.name(), attached.fragmentIndex);
@@ -236,6 +253,9 @@ void addAttachCommand(CLI::App& app, Action& chosen) {
                       "take the new one before one of MOVIE, which stays in the file unread");
     addTimeOptions(*command, options->times);
     addFragmentIndexOption(*command, options->movesIndex);
+    command->add_flag("--unchecked", options->unchecked,
+                      "Attach a STREAM also if its header names no known kind and version, or if it holds bytes "
+                      "but not one whole entry. What --from carries over is never refused for that");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm attach Movie.mp4 cursorLocation.dat slideTitles.dat -o Recording.mp4\n"
                     "zulm attach Remuxed.mp4 --from Recording.mp4 --in-place\n"

@@ -127,6 +127,8 @@ void SavedMovie::commit() {
 
 void SavedMovie::fail(const SaveError& error) const {
     std::string text = fmt::format("{}: {}", error.file() == path_ ? subject_ : error.file(), error.sentence());
+    if (error.reason() == SaveError::Reason::Doubtful)
+        text += "; --unchecked attaches it as it is";
     if (error.reason() == SaveError::Reason::KindExists)
         text += "; --replace adds one that readers take instead";
     if (error.reason() != SaveError::Reason::NotUndone)

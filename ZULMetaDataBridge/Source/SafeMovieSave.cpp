@@ -5,6 +5,7 @@
 #include "ZULMetaData/ContainerRecognition.h"
 #include "ZULMetaData/RecordingInfo.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
+#include "ZULMetaDataBridge/Source/KindEntries.h"
 #include "ZULMetaDataBridge/Source/MovieTransaction.h"
 #include "ZULMetaDataBridge/Source/ZULRAtomWriter.h"
 
@@ -54,25 +55,45 @@ struct Candidate {
     StreamSource::Bytes source;
 };
 
-Candidate examine(const StreamSource& source) {
+/// What makes a source doubtful; empty if nothing does.
+std::string doubtAbout(const StreamExtent& extent, std::uint64_t length) {
+    const MetaDataHeader& header = extent.header;
+    const MetaDataKind* kind = findMetaDataKind(header.uuid);
+    if (!kind)
+        return "is no stream of a known kind: its header begins with the identifier " + metaDataKindName(header.uuid);
+    const std::string name(kind->name);
+    if (!isKnownStream(header))
+        return "is a stream of the kind " + name + " in version " + std::to_string(header.version) +
+               ", which is not known: the last known one is " + std::to_string(kind->currentVersion);
+    if (extent.entries == 0 && length > s_metaDataHeaderSize)
+        return "has " + std::to_string(length - s_metaDataHeaderSize) +
+               " bytes after its header, but not one whole entry";
+    return {};
+}
+
+Candidate examine(const StreamSource& source, SafeMovieSave::Sources sources) {
     Candidate candidate{{}, source.open()};
     const auto extent = measureStream(candidate.source.read, candidate.source.length);
     if (!extent)
         throw SaveError(source.name(), "too short for a stream: " + std::to_string(candidate.source.length) +
                                            " bytes of a " + std::to_string(s_metaDataHeaderSize) + "-byte header");
+    if (sources == SafeMovieSave::Sources::Checked)
+        if (const std::string doubt = doubtAbout(*extent, candidate.source.length); !doubt.empty())
+            throw SaveError(source.name(), doubt, SaveError::Reason::Doubtful);
     candidate.stream = {source.name(),      extent->header.uuid, 0,
                         extent->wholeBytes, extent->entries,     candidate.source.length - extent->wholeBytes,
                         extent->end};
     return candidate;
 }
 
-std::vector<Candidate> examine(const FileLocation& movie, const std::vector<StreamSource>& sources) {
+std::vector<Candidate> examine(const FileLocation& movie, const std::vector<StreamSource>& sources,
+                               SafeMovieSave::Sources which) {
     if (sources.empty())
         throw SaveError(utf8Path(movie), "there are no streams to attach");
     std::vector<Candidate> candidates;
     for (const StreamSource& source : sources) {
         try {
-            candidates.push_back(examine(source));
+            candidates.push_back(examine(source, which));
         } catch (const std::system_error& error) {
             throw SaveError(source.name(), error.what());
         }
@@ -328,24 +349,16 @@ RepairPlan SafeMovieSave::repair() const {
     return save(movie_, progress_, [](Save& work) { return work.repair(); });
 }
 
-AttachResult SafeMovieSave::attach(const std::vector<StreamSource>& streams, Existing existing) const {
-    return attach(streams, existing, FragmentIndex::Leave);
-}
-
-AttachResult SafeMovieSave::attach(const std::vector<StreamSource>& streams, Existing existing,
+AttachResult SafeMovieSave::attach(const std::vector<StreamSource>& streams, Existing existing, Sources sources,
                                    FragmentIndex index) const {
-    std::vector<Candidate> candidates = examine(movie_, streams);
+    std::vector<Candidate> candidates = examine(movie_, streams, sources);
     return save(movie_, progress_, [&](Save& work) { return work.attach(candidates, existing, index); });
 }
 
-void SafeMovieSave::checkAttach(const std::vector<StreamSource>& streams, Existing existing) const {
-    const std::vector<Candidate> candidates = examine(movie_, streams);
+void SafeMovieSave::checkAttach(const std::vector<StreamSource>& streams, Existing existing, Sources sources) const {
+    const std::vector<Candidate> candidates = examine(movie_, streams, sources);
     if (existing == Existing::Refuse)
         refuseExisting(movie_, candidates);
-}
-
-StampResult SafeMovieSave::stamp(const std::string& creatorName, const std::string& creatorVersion) const {
-    return stamp(creatorName, creatorVersion, FragmentIndex::Leave);
 }
 
 StampResult SafeMovieSave::stamp(const std::string& creatorName, const std::string& creatorVersion,

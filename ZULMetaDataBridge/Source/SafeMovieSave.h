@@ -29,6 +29,7 @@ public:
         Failed,     ///< the movie is what it was
         KindExists, ///< so it is, and has a stream of that kind already
         NotUndone,  ///< the operation failed, and the movie could not be made what it was
+        Doubtful,   ///< the movie is what it was: a source does not look like a stream, see `SafeMovieSave::Sources`
     };
 
     /// `what()` gives both: the file, a colon and the sentence.
@@ -88,7 +89,7 @@ struct StampResult {
 /// The movie is locked against other programs that use this class. Needs about a megabyte, whatever the streams hold.
 class ZULMETADATA_API SafeMovieSave {
 public:
-    /// What to do about streams of kinds that the movie has already. Readers take the last one: the others would stay
+    /// What to do about streams of kinds that the movie has already. Readers take the last one; the others would stay
     /// in the file, unread.
     enum class Existing { Refuse, Supersede };
 
@@ -97,30 +98,37 @@ public:
     /// into a `free` atom.
     enum class FragmentIndex { Leave, MoveToEnd };
 
+    /// Which sources are attached. A checked source is a stream of a registered kind and version that holds at least
+    /// one whole entry, or nothing after its header. Anything else is often a wrong path, whose first 24 bytes would
+    /// pass for a header.
+    enum class Sources { Checked, Unchecked };
+
     /// Called now and then with the bytes that were written or read back. What it throws ends and undoes the
     /// operation.
     using Progress = Callback<void(std::uint64_t done, std::uint64_t total)>;
 
     explicit SafeMovieSave(FileLocation movie, Progress progress = {}); ///< does not touch the movie
 
-    /// What `repair` would do. Changes nothing, and needs no right to.
+    /// Returns what `repair` would do. Changes nothing, and needs no right to.
     RepairPlan plan() const;
 
-    /// Gives what was done.
+    /// Returns what was done.
     RepairPlan repair() const;
 
-    /// Appends the streams as one atom, in this order. What stands behind a stream's last whole entry is left out.
-    /// Throws for a stream without a header, for two of one kind, for none at all, and see `Existing`.
-    AttachResult attach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse) const;
-    AttachResult attach(const std::vector<StreamSource>& streams, Existing existing, FragmentIndex index) const;
+    /// Appends the streams as one atom, in this order. Bytes after the last whole entry of a stream are left out.
+    /// Throws if there is no stream, if two are of one kind, if one has no header, and as `Existing` and `Sources` say.
+    /// The entries of an unchecked source are those that its header tells apart, and perhaps none.
+    AttachResult attach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse,
+                        Sources sources = Sources::Checked, FragmentIndex index = FragmentIndex::Leave) const;
 
-    /// Throws what `attach` would for these streams, and changes nothing. For those who copy the movie first.
-    void checkAttach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse) const;
+    /// Throws what `attach` would throw for these streams, and changes nothing. Useful before a movie is copied.
+    void checkAttach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse,
+                     Sources sources = Sources::Checked) const;
 
     /// Appends what `ZULRAtomWriter::writeZULRtoFile` does, without ever ending the process. `creatorName` is not
     /// stored: on any system the platform's name, "Mac", stands in its place.
-    StampResult stamp(const std::string& creatorName, const std::string& creatorVersion) const;
-    StampResult stamp(const std::string& creatorName, const std::string& creatorVersion, FragmentIndex index) const;
+    StampResult stamp(const std::string& creatorName, const std::string& creatorVersion,
+                      FragmentIndex index = FragmentIndex::Leave) const;
 
 private:
     FileLocation movie_;

@@ -223,13 +223,18 @@ def write_stream(path: _Path, kind: Kind, entries: _Entries) -> None:
     _core.write_stream(os.fspath(path), kind, _records_of(entries, dtype_of(kind), _core.coordinates_of(kind)))
 
 
-def attach(movie: _Path, streams: _Source | Iterable[_Source], *, replace: bool = False) -> Attached:
+def attach(
+    movie: _Path, streams: _Source | Iterable[_Source], *, replace: bool = False, unchecked: bool = False
+) -> Attached:
     """Puts streams into a movie: stream files, single streams of other recordings, or all streams of a recording.
     `streams` is one of these, or an iterable of them.
 
     Afterwards the movie holds all of them; otherwise a `SaveError` is raised and the movie is byte for byte what it was.
     A kind that the movie already has is refused unless `replace` is true. Bytes after the last whole entry of a stream
     are left out.
+
+    A source of no known kind and version is refused, and so is one that holds bytes but not one whole entry: it is often
+    a wrong path. The `reason` of the `SaveError` is then 'doubtful'. `unchecked` attaches such a source.
     """
     given = [streams] if isinstance(streams, _SOURCE_TYPES) else streams
     sources: list[str | RecordedStream] = []
@@ -238,7 +243,7 @@ def attach(movie: _Path, streams: _Source | Iterable[_Source], *, replace: bool 
             sources.extend(stream.streams)
         else:
             sources.append(stream if isinstance(stream, RecordedStream) else os.fspath(stream))
-    return _core.attach(os.fspath(movie), sources, replace)
+    return _core.attach(os.fspath(movie), sources, replace, unchecked)
 
 
 def stamp(movie: _Path, creator: str, version: str) -> Creator:

@@ -140,6 +140,17 @@ def test_what_is_printed_tells_something(tmp_path, plain_movie):
     assert repr(plan.changes) == f"[<RepairChange offset=16 bytes=4: {plan.changes[0].reason}>]"
 
 
+def test_a_source_that_is_no_stream_is_attached_only_if_asked_for(plain_movie, tmp_path):
+    wrong = tmp_path / "wrong.dat"
+    wrong.write_bytes(PLAIN_MOVIE + bytes(100))
+    before = plain_movie.read_bytes()
+    with pytest.raises(zulmetadata.SaveError, match="is no stream of a known kind") as caught:
+        zulmetadata.attach(plain_movie, wrong)
+    assert caught.value.reason == "doubtful"
+    assert plain_movie.read_bytes() == before
+    assert len(zulmetadata.attach(plain_movie, wrong, unchecked=True).streams) == 1
+
+
 INVALID = dict(line.split("\t", 1) for line in (DATA / "invalid" / "expected.tsv").read_text().splitlines())
 
 
@@ -150,3 +161,12 @@ def test_damaged_files_are_judged_and_read_without_harm(name):
     assert findings == set(INVALID[name].split())
     for entries in zulmetadata.Recording(file).values():
         entries.tolist()
+
+
+def test_entries_of_another_size_than_their_kind_has_are_not_decoded():
+    recording = zulmetadata.Recording(DATA / "invalid" / "header-scale-as-double.dat")
+    (stream,) = recording.streams
+    assert not stream.is_decodable
+    assert list(recording) == []
+    with pytest.raises(ValueError, match="the entries cannot be decoded"):
+        stream.read()
