@@ -241,12 +241,18 @@ struct Key {
 };
 
 Track recordKeyboardAction(const FileLocation& folder) {
-    static constexpr Key keys[]{{2.0, 'H', 0x20000, "H", "<Shift>"}, {2.2, 'A', 0, "A", "NONE"},
-                                {2.4, 'L', 0, "L", "NONE"},          {2.6, 'L', 0, "L", "NONE"},
-                                {2.8, 'O', 0, "O", "NONE"},          {3.0, 13, 0, "returnKey", "NONE"},
-                                {5.5, 'S', 0x100000, "S", "<Cmd>"},  {7.0, 38, 0x40000000, "up", "(IsVK)"},
-                                {7.3, 13, 0, "returnKey", "NONE"},   {12.8, 39, 0x40000000, "right", "(IsVK)"},
-                                {15.2, 39, 0x40000000, "right", "(IsVK)"},      {19.0, 'Q', 0x120000, "Q", "<Shift><Cmd>"}};
+    static constexpr Key keys[]{{2.0, 'H', 0x20000, "H", "<Shift>"},
+                                {2.2, 'A', 0, "A", "NONE"},
+                                {2.4, 'L', 0, "L", "NONE"},
+                                {2.6, 'L', 0, "L", "NONE"},
+                                {2.8, 'O', 0, "O", "NONE"},
+                                {3.0, 13, 0, "returnKey", "NONE"},
+                                {5.5, 'S', 0x100000, "S", "<Cmd>"},
+                                {7.0, 38, 0x40000000, "up", "(IsVK)"},
+                                {7.3, 13, 0, "returnKey", "NONE"},
+                                {12.8, 39, 0x40000000, "right", "(IsVK)"},
+                                {15.2, 39, 0x40000000, "right", "(IsVK)"},
+                                {19.0, 'Q', 0x120000, "Q", "<Shift><Cmd>"}};
     Track track = newTrack<KeyboardActionMetaDataParser>("keyboardAction", folder);
     KeyboardActionMetaDataWriter writer(track.file);
     for (const Key& key : keys) {

@@ -206,7 +206,8 @@ void MetaDataTail::attachStreams(const std::string& path, const std::string& nam
     if (sources.empty())
         return;
     try {
-        const AttachResult attached = SafeMovieSave(path).attach(sources);
+        const AttachResult attached =
+            SafeMovieSave(path).attach(sources, SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Unchecked);
         for (std::size_t i = 0; i < streams_.size(); ++i)
             bytesCut_ += attached.streams[i].bytesCut + streams_[i].declared - streams_[i].present;
     } catch (const SaveError& error) {

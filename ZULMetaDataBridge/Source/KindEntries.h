@@ -19,8 +19,8 @@ ZULMETADATA_API bool isKnownStream(const MetaDataHeader& header);
 /// known, and its header states the entry size of that kind.
 ZULMETADATA_API bool isDecodable(const MetaDataHeader& header);
 
-/// Returns the size of each entry in bytes for the stream's kind, whatever the header states; 0 if they vary. If the kind is not
-/// recorded or the version is not known, returns what the header states.
+/// Returns the size of each entry in bytes for the stream's kind, whatever the header states; 0 if they vary. If the
+/// kind is not recorded or the version is not known, returns what the header states.
 ZULMETADATA_API std::uint32_t entrySizeOf(const MetaDataHeader& header);
 
 /// Returns the entries as the header divides them. Each is decoded by its kind only if `isDecodable`.
