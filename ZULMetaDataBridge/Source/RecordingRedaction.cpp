@@ -38,7 +38,7 @@ void writeBytes(std::ostream& out, const std::array<char, size>& bytes) {
 
 /// A stream does not call itself failed if it cannot tell its position, and what is written then would stand in the
 /// wrong place.
-std::uint64_t positionOf(std::ostream& out) {
+std::uint64_t offsetOf(std::ostream& out) {
     const auto position = out.tellp();
     if (position < 0)
         failToWrite();
@@ -47,7 +47,7 @@ std::uint64_t positionOf(std::ostream& out) {
 
 /// The file ends where it was written or skipped to.
 void finish(std::ofstream& out, const FileLocation& file) {
-    const std::uint64_t end = positionOf(out);
+    const std::uint64_t end = offsetOf(out);
     out.close();
     if (!out)
         failToWrite();
@@ -64,7 +64,7 @@ std::uint64_t padded(std::uint64_t size) {
 /// Overwrites bytes that were written before.
 template <std::size_t size>
 void patch(std::ostream& out, std::uint64_t offset, const std::array<char, size>& bytes) {
-    const std::uint64_t end = positionOf(out);
+    const std::uint64_t end = offsetOf(out);
     out.seekp(static_cast<std::streamoff>(offset));
     writeBytes(out, bytes);
     out.seekp(static_cast<std::streamoff>(end));
@@ -310,19 +310,19 @@ std::vector<RedactedStream> RecordingRedactor::Work::writeStreamFile(std::ostrea
 
 std::vector<RedactedStream> RecordingRedactor::Work::writeMovieMetaData(std::ostream& out) const {
     std::vector<RedactedStream> streams;
-    const std::uint64_t begin = positionOf(out);
+    const std::uint64_t begin = offsetOf(out);
     writeBytes(out, detail::extendedAtomHeader(detail::s_metaDataAtom, 0));
-    const std::uint64_t first = positionOf(out);
+    const std::uint64_t first = offsetOf(out);
     for (const detail::StreamPart& stream : streams_) {
-        const std::uint64_t start = positionOf(out);
+        const std::uint64_t start = offsetOf(out);
         writeBytes(out, detail::extendedAtomHeader(detail::s_streamAtom, 0));
         streams.push_back(redact(stream, out));
         if (streams.back().removal == RedactedStream::Kept)
-            patch(out, start, detail::extendedAtomHeader(detail::s_streamAtom, positionOf(out) - start));
+            patch(out, start, detail::extendedAtomHeader(detail::s_streamAtom, offsetOf(out) - start));
         else
             out.seekp(static_cast<std::streamoff>(start));
     }
-    const std::uint64_t end = positionOf(out);
+    const std::uint64_t end = offsetOf(out);
     if (end == first)
         out.seekp(static_cast<std::streamoff>(begin));
     else
@@ -332,9 +332,9 @@ std::vector<RedactedStream> RecordingRedactor::Work::writeMovieMetaData(std::ost
 
 std::vector<RedactedStream> RecordingRedactor::Work::writeRIFFMetaData(std::ostream& out) const {
     std::vector<RedactedStream> streams;
-    const std::uint64_t begin = positionOf(out);
+    const std::uint64_t begin = offsetOf(out);
     const auto writeHeader = [&out](std::uint64_t offset, std::uint32_t type) {
-        const std::uint64_t size = positionOf(out) - offset - detail::s_chunkHeaderSize;
+        const std::uint64_t size = offsetOf(out) - offset - detail::s_chunkHeaderSize;
         if (size > s_most32)
             throw RedactionError(Reason::TooLarge,
                                  std::to_string(size) + " bytes of metadata are more than a chunk can hold");
@@ -342,9 +342,9 @@ std::vector<RedactedStream> RecordingRedactor::Work::writeRIFFMetaData(std::ostr
         out.seekp(static_cast<std::streamoff>(size % 2), std::ios::cur);
     };
     writeBytes(out, detail::chunkHeader(detail::s_metaDataAtom, 0));
-    const std::uint64_t first = positionOf(out);
+    const std::uint64_t first = offsetOf(out);
     for (const detail::StreamPart& stream : streams_) {
-        const std::uint64_t start = positionOf(out);
+        const std::uint64_t start = offsetOf(out);
         writeBytes(out, detail::chunkHeader(detail::s_streamAtom, 0));
         streams.push_back(redact(stream, out));
         if (streams.back().removal == RedactedStream::Kept)
@@ -352,7 +352,7 @@ std::vector<RedactedStream> RecordingRedactor::Work::writeRIFFMetaData(std::ostr
         else
             out.seekp(static_cast<std::streamoff>(start));
     }
-    if (positionOf(out) == first)
+    if (offsetOf(out) == first)
         out.seekp(static_cast<std::streamoff>(begin));
     else
         writeHeader(begin, detail::s_metaDataAtom);
@@ -373,12 +373,12 @@ void RecordingRedactor::Work::writeMedia(std::ostream& out) {
         else if (isBeforeMedia(i))
             writeBlank(out, item);
         if (!isMovie())
-            out.seekp(static_cast<std::streamoff>(positionOf(out) % 2), std::ios::cur);
+            out.seekp(static_cast<std::streamoff>(offsetOf(out) % 2), std::ios::cur);
     }
 }
 
 void RecordingRedactor::Work::writeBlank(std::ostream& out, const ContainerItem& item) const {
-    const auto end = static_cast<std::streamoff>(positionOf(out) + item.size);
+    const auto end = static_cast<std::streamoff>(offsetOf(out) + item.size);
     if (!isMovie())
         writeBytes(out, detail::chunkHeader(detail::s_junkChunk, static_cast<std::uint32_t>(item.payloadSize())));
     else if (item.size > s_most32)
