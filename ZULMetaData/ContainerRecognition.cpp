@@ -73,6 +73,7 @@ struct FirstAtom {
     bool hasSize() const {
         return isThere && (size >= detail::s_atomHeaderSize || size == 0 || size == detail::s_extendedSizeMarker);
     }
+    bool fits(std::uint64_t fileSize) const { return isThere && size >= detail::s_atomHeaderSize && size <= fileSize; }
     bool isPrintable() const {
         return isThere && std::all_of(type.begin(), type.end(), [](char c) { return c >= ' ' && c <= '~'; });
     }
@@ -129,7 +130,8 @@ MetaDataParser::StreamType typeByName(std::string_view bytes, std::uint64_t file
     switch (named) {
     case MetaDataParser::RawStream: return named;
     case MetaDataParser::Riff: return atom.isThere ? MetaDataParser::Unknown : named;
-    case MetaDataParser::QuickTime: return !atom.isThere || atom.isPrintable() ? named : MetaDataParser::Unknown;
+    case MetaDataParser::QuickTime:
+        return !atom.isThere || atom.isPrintable() || atom.fits(fileSize) ? named : MetaDataParser::Unknown;
     default: break;
     }
     const bool fits = atom.hasSize() && atom.isPrintable() && atom.size <= fileSize;

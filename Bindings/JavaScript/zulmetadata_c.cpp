@@ -107,7 +107,7 @@ ReadSlice readingWith(ZulmReadAt readAt, void* context) {
 
 MetaDataParser::StreamType typeOf(const ReadSlice& read, std::uint64_t fileSize, const std::string& name) {
     std::array<char, s_recognitionBytes> first;
-    const std::size_t size = read(0, first.data(), first.size());
+    const std::size_t size = Zulm::orUnreadable(name, [&] { return read(0, first.data(), first.size()); });
     const RecognizedContainer recognized = recognizeContainer({first.data(), size}, fileSize, name);
     if (recognized.type == MetaDataParser::Unknown)
         throw Zulm::Failure(fmt::format("{}: {}", name, recognized.refusal()));

@@ -96,13 +96,15 @@ def make_recordings(folder, zulm):
     metadata = recording.index(b"ZULM") - 4
     for name in ("Recording", "Original", "Edited"):
         (folder / f"{name}.mp4").write_bytes(recording)
-    for name in ("Movie", "Remuxed", "Copy"):
+    for name in ("Movie", "Remuxed", "Copy", "Cut"):
         (folder / f"{name}.mp4").write_bytes(recording[:metadata])
     (folder / "Broken.mp4").write_bytes(recording[:-100])
     for stream in (folder / "demo" / "streams").iterdir():
         shutil.copy(stream, folder / stream.name)
     shutil.rmtree(folder / "demo")
     (folder / "private").mkdir()
+    (folder / "Recordings").mkdir()
+    shutil.copy(folder / "Recording.mp4", folder / "Recordings")
 
 
 def shell_lines(code):

@@ -357,7 +357,7 @@ TEST_F(RedactCommand, ListsWhatWouldGo) {
     EXPECT_EQ(document["dry_run"], true);
     EXPECT_EQ(document["entries"].size(), 5U);
     EXPECT_EQ(document["entries"][0]["stream"], "topmostAppName");
-    EXPECT_EQ(document["entries"][0]["action"], "changed");
+    EXPECT_EQ(document["entries"][0]["change"], "changed");
     EXPECT_EQ(document["places"][0]["reason"], "creator");
     EXPECT_EQ(std::distance(std::filesystem::directory_iterator(folder.path()), {}), 1) << "nothing is written";
     EXPECT_EQ(runTool({"redact", file, "--keys"}).exitCode, 2) << "neither --output nor --dry-run";

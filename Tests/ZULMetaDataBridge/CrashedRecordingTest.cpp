@@ -48,7 +48,7 @@ protected:
         std::vector<StreamSource> sources;
         for (const std::string& file : files)
             sources.push_back(StreamSource::file(file));
-        SafeMovieSave(movie).attach(sources);
+        SafeMovieSave(movie).attach(sources, SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Unchecked);
     }
 
     /// The entries whose bytes are all there.

@@ -164,7 +164,7 @@ TEST(MetaDataValidator, SaysHowFarAReaderCanBeTrusted) {
     const std::string good = cursorEntry(1, "");
     const std::string contradicting = le32(29) + f64(1) + le64(7) + le32(8) + le32(0) + le32(3) + "x";
     const std::string images = streamHeader(s_images, 2, 0) + good + contradicting + good;
-    EXPECT_EQ(findingsIn(images, s_raw), "cursor-sizes@56");
+    EXPECT_EQ(findingsIn(images, s_raw), "cursor-without-image@24 cursor-sizes@56");
     EXPECT_EQ(readable(images), 56U);
     EXPECT_EQ(validated(images, s_raw).wholeEntries, 2U);
 }
@@ -442,7 +442,7 @@ TEST(MetaDataValidator, ReadsNoByteManyTimes) {
     for (const auto& [bytes, type] : files) {
         WatchedStream stream(bytes);
         validateRecording(stream, type);
-        EXPECT_LE(stream.buffer().bytesRead(), 2 * bytes.size());
+        EXPECT_LE(stream.buffer().bytesRead(), 3 * bytes.size()); // once to find the duration
     }
 }
 

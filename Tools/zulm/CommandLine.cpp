@@ -88,7 +88,7 @@ std::string usageText(const CLI::ParseError& error) {
     if (dynamic_cast<const CLI::ArgumentMismatch*>(&error) && has("At Most"))
         return fmt::format("{} is given more than once", name);
     if (dynamic_cast<const CLI::ArgumentMismatch*>(&error) && has("flag override"))
-        return fmt::format("{} takes no value", name);
+        return fmt::format("{}{} takes no value", name.size() > 1 ? "--" : "-", name);
     if (dynamic_cast<const CLI::ExcludesError*>(&error) && has(" excludes "))
         return replaced(" excludes ", " cannot be given together with ");
     if (dynamic_cast<const CLI::RequiresError*>(&error) && has(" requires "))
@@ -163,7 +163,7 @@ constexpr auto s_examples = "zulm info Recording.mp4                            
 /// A flag is given or not: the parser would take "--json=false" too, and "--json=3".
 void refuseValuesOfFlags(CLI::App& app) {
     for (CLI::Option* option : app.get_options())
-        if (option->get_type_size() == 0)
+        if (option->get_expected_max() == 0)
             option->disable_flag_override();
 }
 

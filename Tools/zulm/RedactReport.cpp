@@ -43,7 +43,7 @@ Json originalOf(const RedactedEntry& entry) {
 }
 
 Json entryDocumentOf(const RedactedEntry& entry) {
-    Json document{{"stream", metaDataKindName(entry.header.uuid)}, {"action", actionText(entry.action)}};
+    Json document{{"stream", metaDataKindName(entry.header.uuid)}, {"change", actionText(entry.action)}};
     document.update(originalOf(entry));
     return document;
 }

@@ -32,6 +32,7 @@ struct VerifyOptions {
 
 std::vector<std::string> ruleNames() {
     std::vector<std::string> names;
+    names.reserve(s_findingRules.size());
     for (const FindingRule& rule : s_findingRules)
         names.emplace_back(rule.name);
     return names;
@@ -140,8 +141,7 @@ void addVerifyCommand(CLI::App& app, Action& chosen) {
             },
             "Neither report nor count what this rule finds (repeatable); --rules lists the rules")
         ->type_name("RULE")
-        ->expected(1)
-        ->multi_option_policy(CLI::MultiOptionPolicy::TakeAll);
+        ->allow_extra_args(false);
     command->add_flag("--rules", options->listsRules, "List every rule with its severity and its meaning, and end");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm verify Recording.mp4\nzulm verify --json *.mp4\n"

@@ -9,12 +9,12 @@
 //     RecordingRedactor(recording, MetaDataParser::QuickTime, redaction).write("Public.mp4");
 
 #include "../../Platform/FileLocation.h"
+#include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
 #include "../../ZULMetaData/ZULMMetaDataParser.h"
 #include "StreamRedaction.h"
 
 #include <cstdint>
-#include <functional>
 #include <istream>
 #include <memory>
 #include <stdexcept>
@@ -43,7 +43,7 @@ struct RecordingRedaction {
 
     /// Returns other ways to write a text, such as the normal forms of Unicode, in which the text must not be found
     /// either. May be empty.
-    std::function<std::vector<std::string>(const std::string&)> spellings;
+    Callback<std::vector<std::string>(const std::string&)> spellings;
 };
 
 /// A part of the container, apart from the streams, that the copy lacks.
@@ -99,7 +99,7 @@ public:
     enum class Step { Searching, Copying, Checking };
 
     /// Called now and then with the bytes of a step that are done. What it throws ends the work.
-    using Progress = std::function<void(Step step, std::uint64_t done, std::uint64_t total)>;
+    using Progress = Callback<void(Step step, std::uint64_t done, std::uint64_t total)>;
 
     /// `recording` is the caller's and must outlive this. Throws `std::system_error` if it cannot be read.
     RecordingRedactor(std::istream& recording, MetaDataParser::StreamType type, RecordingRedaction redaction,

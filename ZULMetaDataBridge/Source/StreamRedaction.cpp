@@ -52,8 +52,9 @@ public:
 private:
     /// An entry that goes back in time, or nowhere, does not tell when the text before it ended.
     bool wasRemoved(double end) const {
-        constexpr double never = std::numeric_limits<double>::infinity();
-        return times_.isRemoved(last_->time) || times_.meets(last_->time, end >= last_->time ? end : never);
+        if (!(end >= last_->time))
+            end = std::numeric_limits<double>::infinity();
+        return times_.isRemoved(last_->time) || times_.meets(last_->time, end);
     }
 
     const detail::RemovedTimes& times_;

@@ -111,12 +111,16 @@ def test_streams_that_cannot_be_decoded_are_listed_only(tmp_path):
 
 def test_what_cannot_be_opened_is_an_os_error(tmp_path):
     missing = tmp_path / "missing.mp4"
+    notes = tmp_path / "notes.txt"
+    notes.write_text("neither a movie nor a stream")
     for call in (zulmetadata.Recording, zulmetadata.verify):
         with pytest.raises(FileNotFoundError) as error:
             call(missing)
         assert error.value.filename == str(missing)
-        with pytest.raises(ValueError, match="begins neither"):
+        with pytest.raises(OSError):
             call(tmp_path)
+        with pytest.raises(ValueError, match="begins neither"):
+            call(notes)
 
 
 def test_errors_of_a_file_that_vanished_name_it(tmp_path, recording):

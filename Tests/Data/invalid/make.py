@@ -293,7 +293,7 @@ def headers():
     invalid("header-entry-size-of-text.dat", header(APP, 16) + text(0.5, b"Abc"), "texts have no fixed size",
             ("entry-size-mismatch", 20))
     invalid("header-entry-size-of-image.dat", header(IMAGE, 32, 2) + cursor(), "cursor images have no fixed size",
-            ("entry-size-mismatch", 20), ("cursor-without-image", 24))
+            ("entry-size-mismatch", 20))
     invalid("header-scale-as-double.dat", header(SCALE, 16) + seconds(0.0) + seconds(2.0),
             "the scale factor is an integer, not a 64-bit float", ("entry-size-mismatch", 20))
     invalid("header-unknown-kind-without-time.dat", header(STRANGE, 7) + b"1234567",
@@ -423,7 +423,8 @@ def cursors():
             "the image states a size of 4 GiB",
             ("image-beyond-entry", 24))
     invalid("cursor-image-takes-the-type.dat", start + cursor(picture, image_size=len(picture) + 6),
-            "the image states a size that is 6 bytes too large and leaves no space for the cursor's type", ("cursor-data", 24))
+            "the image states a size that is 6 bytes too large and leaves no space for the cursor's type", ("cursor-data", 24),
+            ("image-surplus", 137))
     invalid("cursor-version-1-half-hot-spot.dat",
             header(IMAGE, 0, 1) + le32(25) + seconds(1.0) + struct.pack("<Q", 7) + le32(5) + b"\0" * 5,
             "the data part of version 1 ends inside its hot spot", ("cursor-data", 24))

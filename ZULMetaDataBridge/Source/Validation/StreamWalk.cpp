@@ -362,8 +362,9 @@ void StreamWalk::noteTime(std::uint64_t entryStart, double time) {
     report_.lastTime = time;
 }
 
+/// Nobody knows what the entries of an unknown kind begin with.
 void StreamWalk::reportBeyondDuration() {
-    if (beyondDuration_ > 0)
+    if (beyondDuration_ > 0 && findMetaDataKind(report_.type))
         add(FindingCode::BeyondDuration, firstBeyond_, beyondDuration_,
             beyondDuration_ == 1 ? " entry lies" : " entries lie", " after the end of the movie at ", *duration_,
             " seconds, the first at ", firstTimeBeyond_);
