@@ -144,7 +144,7 @@ def test_names_that_are_not_utf8(tmp_path):
         zulmetadata.Recording(unknown)
     newer = tmp_path / os.fsdecode(b"\xff.dat")
     newer.write_bytes(stream(CURSOR_LOCATION, 9, 16))
-    with pytest.raises(ValueError, match=r"\udcff.dat: a stream of a version"):
+    with pytest.raises(ValueError, match=r"\udcff.dat: the entries cannot be decoded"):
         zulmetadata.Recording(newer).streams[0].read()
 
 
