@@ -167,7 +167,7 @@ std::optional<Atom> Planner::atomAt(std::uint64_t position) {
     return atom;
 }
 
-/// A `DATA` atom as this library writes it, with its stream's header. Its end may lie anywhere behind that.
+/// A `DATA` atom as this library writes it, with its stream's header. Its end may lie anywhere after that.
 std::optional<Atom> Planner::streamAtomAt(std::uint64_t position) {
     const auto atom = atomAt(position);
     if (!atom || !atom->isExtended() || atom->type != detail::s_streamAtom || atom->size < s_smallestStreamAtom ||
@@ -292,8 +292,8 @@ void Planner::walkOver(const Atom& atom, std::uint64_t& position) {
     }
 }
 
-/// Whether an atom, which the walk can go on behind, was repaired to 8 bytes less than it has. Behind it are then 8
-/// bytes of media, and after them the end of the file or what was appended.
+/// Whether an atom, after which the walk can go on, was repaired to 8 bytes less than it has. It is then followed by 8
+/// bytes of media, and these by the end of the file or by what was appended.
 bool Planner::isLeftShort(const Atom& atom) {
     if (!atom.isExtended() || atom.size <= s_largestShortSize || total_ - atom.end() < s_shortBy)
         return false;
@@ -326,7 +326,7 @@ void Planner::closeOpenEnd(const Atom& last) {
     }
     if (previous_.type != detail::s_spareAtom || previous_.size != detail::s_atomHeaderSize)
         return giveUp(last, "has an open end, and its " + bytesText(length) +
-                                " do not fit in a 32-bit size; no spare 'wide' atom stands in front of it");
+                                " do not fit in a 32-bit size; there is no spare 'wide' atom before it");
     find(last, "has an open end");
     change(previous_.start, text(detail::extendedAtomHeader(last.type, length + previous_.size)),
            "The atom " + typeText(last.type) +
@@ -346,7 +346,7 @@ void Planner::closeMetaData(const Atom& metaData) {
     if (end < total_)
         setAside(end, "an entry that was cut short");
     change(metaData.sizeField(), text(detail::bigEndianBytes(end - metaData.start)),
-           end < total_ ? "The atom 'ZULM' ends behind its last whole entry."
+           end < total_ ? "The atom 'ZULM' ends after its last whole entry."
                         : "The atom 'ZULM' ends where the file does.");
 }
 
@@ -390,11 +390,11 @@ std::uint64_t Planner::endOfTornStream(const Atom& stream) {
     if (isFollowed)
         return total_; // its length counts a torn tail that is not there, and more streams follow
     change(stream.sizeField(), text(detail::bigEndianBytes(end - stream.start)),
-           "The last stream ends behind its last whole entry.");
+           "The last stream ends after its last whole entry.");
     return end;
 }
 
-/// A reader takes the bytes of an entry that was cut short from whatever follows it: nothing of it may stay behind
+/// A reader takes the bytes of an entry that was cut short from whatever follows it: nothing of it may stay after
 /// the last whole one.
 void Planner::setAside(std::uint64_t begin, const std::string& what) {
     const std::uint64_t count = total_ - begin;

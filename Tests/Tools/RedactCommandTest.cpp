@@ -186,7 +186,7 @@ TEST_F(RedactCommand, DropsATornTailAndSaysSo) {
     const std::string file = write("torn.dat", appNameStream() + "secret tail");
     const ToolResult result = runTool({"redact", file, "-o", folder / "out.dat", "--keys"});
     EXPECT_EQ(result.exitCode, 3);
-    EXPECT_THAT(result.errors, HasSubstr("topmostAppName: left out 11 bytes behind its last whole entry"));
+    EXPECT_THAT(result.errors, HasSubstr("topmostAppName: left out 11 bytes after its last whole entry"));
     EXPECT_EQ(contentsOf(folder / "out.dat"), appNameStream());
     EXPECT_EQ(runTool({"verify", folder / "out.dat"}).exitCode, 0);
 }

@@ -137,8 +137,8 @@ TEST_F(VerifyCommand, PrintsNoticesAndEndsWell) {
     const ToolResult result = runTool({"verify", file});
     EXPECT_EQ(result.exitCode, 0);
     EXPECT_EQ(result.output, file +
-                                 ": cursorLocation at offset 40: notice: the entry's time 1 lies before 2, a time in "
-                                 "front of it [time-backwards]\n" +
+                                 ": cursorLocation at offset 40: notice: the entry's time 1 is before 2, the time of "
+                                 "an earlier entry [time-backwards]\n" +
                                  file + ": ok (1 stream, 2 entries)\n");
 }
 
@@ -175,7 +175,8 @@ TEST_F(VerifyCommand, CallsAStreamThatWasReplacedNoDamage) {
     ASSERT_EQ(runTool({"attach", copy, streamFile("cpuUsage"), "--replace", "--in-place"}).exitCode, 0);
     const ToolResult result = runTool({"verify", copy});
     EXPECT_EQ(result.exitCode, 0);
-    EXPECT_NE(result.output.find("notice: this stream takes the place of an earlier one"), std::string::npos);
+    EXPECT_NE(result.output.find("notice: this stream hides an earlier stream of its kind at offset"),
+              std::string::npos);
 }
 
 TEST_F(VerifyCommand, SaysHowManyFindingsItLeavesOut) {

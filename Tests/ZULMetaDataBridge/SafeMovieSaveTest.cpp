@@ -392,7 +392,7 @@ TEST_F(SafeSave, RefusesToAppendBehindFourGiBThatCannotBeSized) {
         SafeMovieSave(movie).attach(files);
         ADD_FAILURE() << "appended where no reader comes";
     } catch (const SaveError& error) {
-        EXPECT_THAT(error.what(), HasSubstr("no spare 'wide' atom stands in front of it"));
+        EXPECT_THAT(error.what(), HasSubstr("there is no spare 'wide' atom before it"));
     }
     EXPECT_EQ(std::filesystem::file_size(movie), 12 + s_4GiB);
     ZULMAtomWriter().writeMetaDataFiles({folder / "a.dat"}, movie);

@@ -108,7 +108,7 @@ ExitCode complainAboutWhatIsLeftOut(const std::string& name, const RedactedRecor
             continue;
         code = ExitDamaged;
         if (stream.bytesLeftOut > 0)
-            complain(fmt::format("{}: {}: left out {} bytes behind its last whole entry", name,
+            complain(fmt::format("{}: {}: left out {} bytes after its last whole entry", name,
                                  metaDataKindName(stream.header.uuid), stream.bytesLeftOut));
         else
             complain(

@@ -166,9 +166,10 @@ void warnOfFragmentIndex(const std::string& name, FragmentIndexState state) {
 }
 
 std::string unrepairableText(const std::string& path, const RepairPlan& plan) {
-    return fmt::format("{}: {}; nothing that is put behind it could be found. 'zulm salvage {} -o DIR' searches it for "
-                       "metadata streams",
-                       path, plan.finding, shellWord(path));
+    return fmt::format(
+        "{}: {}; nothing that is appended to it could be found. 'zulm salvage {} -o DIR' searches it for "
+        "metadata streams",
+        path, plan.finding, shellWord(path));
 }
 
 void printRepair(const std::string& path, const RepairPlan& plan) {

@@ -82,7 +82,7 @@ std::optional<ContainerWalk::Item> ContainerWalk::readChildAtom(std::uint64_t en
 bool ContainerWalk::hasUsableSize(const Item& atom) {
     if (!atom.isMarked)
         add(FindingCode::SizeMarker, nameOf(atom.type), atom.start,
-            "the 32-bit size is no size of an atom, and not the mark of an extended one either");
+            "the 32-bit size is neither the size of an atom nor 1, the mark of a 64-bit size");
     if (atom.size < atom.headerSize)
         add(FindingCode::SizeBelowHeader, nameOf(atom.type), atom.start, "the atom says that it has ", atom.size,
             " bytes, fewer than the ", atom.headerSize, " of its header");
@@ -96,11 +96,11 @@ void ContainerWalk::reportOverrun(const Item& item) {
             " bytes, of which the file holds ", left);
     else
         add(FindingCode::BeyondParent, nameOf(item.type), item.start, "it says that it has ", item.size,
-            " bytes, which reach beyond the end of the ZULM around it");
+            " bytes, which reach beyond the end of its ZULM");
 }
 
 void ContainerWalk::reportForeignChild(const Item& child) {
-    add(FindingCode::ForeignChild, nameOf(child.type), child.start, "only DATA belongs into ZULM");
+    add(FindingCode::ForeignChild, nameOf(child.type), child.start, "ZULM may hold only DATA");
 }
 
 // ---- movies ----
@@ -173,11 +173,11 @@ bool ContainerWalk::visitChildAtom(const Item& child, Surroundings& around) {
     return true;
 }
 
-/// True where the atom ends early, in front of a tail that it only counts. The position is then the true end.
+/// Returns true if the atom ends early, before a tail that it only counts. The position is then the true end.
 bool ContainerWalk::walkStreamAtom(const Item& atom, Surroundings& around) {
     if (atom.headerSize != s_extendedAtomHeaderSize)
         add(FindingCode::ShortDataHeader, nameOf(atom.type), atom.start,
-            "readers take every DATA header for one of 16 bytes, and lose the last 8 bytes of this one's stream");
+            "readers assume that every DATA header has 16 bytes, and lose the last 8 bytes of this stream");
     const auto isStreamAtom = [this, end = around.end](std::uint64_t at) { return isStreamAtomAt(at, end); };
     const StreamWalk::Outcome walked =
         walkStream(atom.dataSize(), atom.endUpTo(around.end), around.isReachable, isStreamAtom);
@@ -185,7 +185,7 @@ bool ContainerWalk::walkStreamAtom(const Item& atom, Surroundings& around) {
         return false;
     add(FindingCode::DroppedTail, nameOf(atom.type), atom.start, "the size counts ",
         atom.size - (walked.wholeEnd - atom.start),
-        " bytes of a torn entry that were left out of the stream: whatever follows it in the ZULM cannot be reached");
+        " bytes of a torn entry that were left out of the stream: readers do not find what follows it in the ZULM");
     around.isReachable = false;
     input_.moveTo(walked.wholeEnd);
     return true;
@@ -233,9 +233,9 @@ void ContainerWalk::moveBehindWideChunk(const Item& chunk, const WideRIFF& wide)
         input_.moveTo(wide.end); // the end of the file
     if (input_.position() < input_.total())
         add(FindingCode::WideRIFF, nameOf(chunk.type), chunk.start, "its size ",
-            wide.isDeclared ? "stands in 64 bits in its ds64 chunk"
+            wide.isDeclared ? "is stored in 64 bits in its ds64 chunk"
                             : "was never set, as in a file that came from a pipe",
-            ": readers that go by the 32-bit size find no metadata after it");
+            ": readers that use the 32-bit size find no metadata after it");
 }
 
 std::optional<ContainerWalk::Item> ContainerWalk::readChunk(std::uint64_t end, std::string_view around) {
@@ -255,7 +255,7 @@ bool ContainerWalk::visitTopChunk(const Item& chunk) {
     if (chunk.dataSize() == 0) {
         if (input_.position() < input_.total())
             add(FindingCode::ZeroSizeChunk, nameOf(chunk.type), chunk.start,
-                "the chunk has no data: readers look for nothing behind it");
+                "the chunk has no data: readers ignore all that follows it");
         return false;
     }
     const bool isWhole = chunk.fits(input_.total());
@@ -272,7 +272,7 @@ bool ContainerWalk::walkMetaDataChunk(std::uint64_t end) {
             return true;
         if (child->dataSize() == 0) {
             add(FindingCode::ZeroSizeChild, nameOf(child->type), child->start,
-                "the chunk has no data: readers look for nothing behind it, in the ZULM or in the file");
+                "the chunk has no data: readers ignore all that follows it, in the ZULM and in the file");
             return false;
         }
         if (child->type == s_streamAtom)
@@ -306,8 +306,8 @@ void ContainerWalk::walkRawStream() {
 
 void ContainerWalk::noteMetaData(const Item& item) {
     if (metaDataOffset_)
-        add(FindingCode::SeveralMetaDataAtoms, nameOf(item.type), item.start, "there is another one at offset ",
-            *metaDataOffset_);
+        add(FindingCode::SeveralMetaDataAtoms, nameOf(item.type), item.start,
+            "this is not the first ZULM: an earlier one is at offset ", *metaDataOffset_);
     else
         metaDataOffset_ = item.start;
 }
@@ -320,7 +320,7 @@ StreamWalk::Outcome ContainerWalk::walkStream(std::uint64_t declared, std::uint6
     const auto outcome = StreamWalk(input_, log_, stream, end, report_.duration, std::move(isNextStream)).run();
     if (!isReachable)
         log_.add(stream.findings, FindingCode::UnreachableStream, stream.name(), stream.offset,
-                 "no reader finds this stream, because of the damage in front of it");
+                 "readers do not find this stream, because the ZULM is damaged before it");
     else if (stream.presentBytes >= sizeof(MetaDataHeader))
         noteKind(stream);
     lastEntrySize_ = stream.fixedEntrySize;
@@ -331,8 +331,7 @@ StreamWalk::Outcome ContainerWalk::walkStream(std::uint64_t declared, std::uint6
 void ContainerWalk::noteKind(StreamReport& stream) {
     if (const auto other = offsetOfKind_.find(stream.type); other != offsetOfKind_.end())
         log_.add(stream.findings, FindingCode::DuplicateStream, stream.name(), stream.offset,
-                 "this stream takes the place of an earlier one of its kind at offset ", other->second,
-                 ", which no reader finds any more");
+                 "this stream hides an earlier stream of its kind at offset ", other->second);
     if (report_.streamCount < ValidationReport::s_maximumStreams)
         offsetOfKind_[stream.type] = stream.offset;
 }

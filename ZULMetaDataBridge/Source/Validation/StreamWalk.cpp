@@ -65,8 +65,8 @@ StreamWalk::Outcome StreamWalk::run() {
 
 bool StreamWalk::readHeader() {
     if (report_.presentBytes < sizeof(MetaDataHeader)) {
-        add(FindingCode::ShortHeader, report_.offset, "the stream has ", report_.presentBytes, " bytes of a header of ",
-            sizeof(MetaDataHeader));
+        add(FindingCode::ShortHeader, report_.offset, "the stream has ", report_.presentBytes,
+            " bytes, fewer than the ", sizeof(MetaDataHeader), " of a header");
         return false;
     }
     const auto header = input_.read<MetaDataHeader>();
@@ -85,10 +85,10 @@ bool StreamWalk::isVersionKnown() {
     const std::uint64_t offset = report_.offset + offsetof(MetaDataHeader, version);
     const MetaDataKind* kind = findMetaDataKind(report_.type);
     if (report_.version < 1)
-        add(FindingCode::BadVersion, offset, "version ", report_.version, " is no version: readers refuse the stream");
+        add(FindingCode::BadVersion, offset, "version ", report_.version, " is below 1: readers refuse the stream");
     else if (kind && report_.version > kind->currentVersion)
         add(FindingCode::NewerVersion, offset, "version ", report_.version, " is newer than ", kind->currentVersion,
-            ", the last one known: readers refuse the stream");
+            ", the newest that is known: readers refuse the stream");
     return kind && report_.version >= 1 && report_.version <= kind->currentVersion;
 }
 
@@ -131,7 +131,7 @@ void StreamWalk::walkUnknown() {
         walkFixed(report_.fixedEntrySize);
     else
         add(FindingCode::EntrySizeMismatch, report_.offset + offsetof(MetaDataHeader, fixedEntrySize),
-            "the header says that entries take ", report_.fixedEntrySize, " bytes, which do not hold their time");
+            "the header says that entries take ", report_.fixedEntrySize, " bytes, too few for a time");
 }
 
 void StreamWalk::walkFixed(std::uint64_t entrySize) {
@@ -158,7 +158,7 @@ void StreamWalk::walkSized(std::uint32_t minimum, Check check) {
         if (size < minimum || end_ - input_.position() < size) {
             if (!isTailLeftOut())
                 reportFrame(entry, size, minimum);
-            return; // nothing behind it can be told apart
+            return; // what follows cannot be told apart
         }
         entry.end = input_.position() + size;
         const bool isReadable = report_.readableBytes == entry.start - report_.offset;
@@ -179,14 +179,14 @@ void StreamWalk::reportFrame(const Entry& entry, std::uint32_t size, std::uint32
     else if (size == 0)
         add(FindingCode::ZeroEntrySize, entry.start, "the entry says that it has 0 bytes");
     else if (size < minimum)
-        add(FindingCode::EntryTooSmall, entry.start, "the entry says that it has ", size, " bytes behind its size, of ",
-            minimum, " at least");
+        add(FindingCode::EntryTooSmall, entry.start, "the entry says that ", size,
+            " bytes follow its size, but at least ", minimum, " must");
     else if (left < std::uint64_t{s_sizeSize} + minimum)
         add(FindingCode::TornEntry, entry.start, "the last entry has ", left, " of at least ", s_sizeSize + minimum,
             " bytes");
     else
-        add(FindingCode::EntryBeyondEnd, entry.start, "the entry says that it has ", size,
-            " bytes behind its size, of which ", left - s_sizeSize, " are there");
+        add(FindingCode::EntryBeyondEnd, entry.start, "the entry says that ", size, " bytes follow its size, but only ",
+            left - s_sizeSize, " do");
 }
 
 bool StreamWalk::isTailLeftOut() {
@@ -216,11 +216,11 @@ bool StreamWalk::checkList(const Entry& entry, std::uint32_t neededTexts) {
             return false;
     if (input_.position() != entry.end) {
         add(FindingCode::ListTotal, entry.start, "the list's total counts ", entry.end - input_.position(),
-            " bytes behind its last text");
+            " bytes after its last text");
         return false;
     }
     if (count < neededTexts)
-        add(FindingCode::TooFewTexts, entry.start, "the list has ", count, " texts of ", neededTexts);
+        add(FindingCode::TooFewTexts, entry.start, "the list has ", count, " texts, but its kind needs ", neededTexts);
     return true;
 }
 
@@ -232,13 +232,13 @@ bool StreamWalk::checkListText(const Entry& entry, std::uint32_t index) {
     }
     const auto size = input_.read<std::uint32_t>();
     if (size < s_timeSize) {
-        add(FindingCode::EntryTooSmall, start, "text ", index + 1, " says that it has ", size,
-            " bytes behind its size, of ", s_timeSize, " at least");
+        add(FindingCode::EntryTooSmall, start, "text ", index + 1, " says that ", size,
+            " bytes follow its size, but at least ", s_timeSize, " must");
         return false;
     }
     if (size > entry.end - input_.position()) {
         add(FindingCode::ListTotal, entry.start, "the list's total ends inside text ", index + 1, ", which has ", size,
-            " bytes behind its size");
+            " bytes after its size");
         return false;
     }
     const auto time = input_.read<double>();
@@ -288,7 +288,7 @@ bool StreamWalk::checkCursorData(const Entry& entry, const CursorImageSchema& sc
     noteCursor(entry.start, record.image.uniqueId, hasImage);
     if (input_.position() < entry.end)
         add(FindingCode::LeftoverBytes, input_.position(), "the record has ", entry.end - input_.position(),
-            " bytes behind its last known field");
+            " bytes after its last known field");
     return true;
 }
 
@@ -350,8 +350,8 @@ void StreamWalk::noteTime(std::uint64_t entryStart, double time) {
         return;
     }
     if (time < latestTime_)
-        add(FindingCode::TimeBackwards, entryStart, "the entry's time ", time, " lies before ", latestTime_,
-            ", a time in front of it");
+        add(FindingCode::TimeBackwards, entryStart, "the entry's time ", time, " is before ", latestTime_,
+            ", the time of an earlier entry");
     latestTime_ = time;
     if (duration_ && *duration_ > 0 && time > *duration_ + s_durationTolerance && beyondDuration_++ == 0) {
         firstBeyond_ = entryStart;
@@ -373,7 +373,8 @@ void StreamWalk::reportBeyondDuration() {
 /// Once for each identifier.
 void StreamWalk::noteCursor(std::uint64_t entryStart, std::uint64_t identifier, bool hasImage) {
     if (cursors_.insert(identifier).second && !hasImage)
-        add(FindingCode::CursorWithoutImage, entryStart, "the cursor ", identifier, " has no image here or before");
+        add(FindingCode::CursorWithoutImage, entryStart, "the cursor ", identifier,
+            " has no image in this entry or in an earlier one");
 }
 
 } // namespace ZULMetaData::detail
