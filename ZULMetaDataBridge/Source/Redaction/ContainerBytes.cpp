@@ -79,7 +79,8 @@ std::vector<std::string> textRuns(std::string_view bytes) {
         begin = std::find_if(begin, bytes.end(), isTextByte);
         const auto end = std::find_if_not(begin, bytes.end(), isTextByte);
         if (static_cast<std::size_t>(end - begin) >= s_shortestRun)
-            runs.push_back(decodedText({begin, end}));
+            runs.push_back(decodedText(
+                bytes.substr(static_cast<std::size_t>(begin - bytes.begin()), static_cast<std::size_t>(end - begin))));
         begin = end;
     }
     return runs;

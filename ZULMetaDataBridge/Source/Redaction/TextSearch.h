@@ -5,6 +5,7 @@
 // A short text is found in the bytes of any movie by chance. So a text of fewer than eight characters, or of fewer than
 // four different ones, is compared with whole texts and words only.
 
+#include "SharedDependencies/Callback.h"
 #include "ZULMetaData/StreamExtent.h"
 
 #include <cstddef>
@@ -22,7 +23,7 @@ namespace ZULMetaData::detail {
 class TextSearch {
 public:
     /// Returns other ways to write a text, such as the normal forms of Unicode. May be empty.
-    using Spellings = std::function<std::vector<std::string>(const std::string&)>;
+    using Spellings = Callback<std::vector<std::string>(const std::string&)>;
 
     TextSearch(const std::set<std::string>& texts, const Spellings& spellings);
 
