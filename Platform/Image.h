@@ -29,7 +29,7 @@ struct EncodedImageCheck {
         NotUnpacked, ///< nothing but the pixels was examined, because they take too much time or memory
     };
 
-    State state = Undecodable;
+    State state = Undecodable;       ///< the result of the check
     std::uint32_t width = 0;         ///< in pixels; 0 if the headers are damaged
     std::uint32_t height = 0;        ///< in pixels; 0 if the headers are damaged
     std::uint64_t unpackedBytes = 0; ///< of all pixels, before the file compressed them; 0 if the headers are damaged

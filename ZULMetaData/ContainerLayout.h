@@ -31,7 +31,7 @@ struct ZULMETADATA_API ContainerItem {
         SizeChunk, ///< the `ds64` chunk inside of an `RF64` or `BW64` chunk
         FileEnd,   ///< the end of the file or the metadata at it: the RIFF file was written to a pipe
     };
-    SizeSource sizeSource = Header;
+    SizeSource sizeSource = Header; ///< `Header` for every atom
 
     bool isExtended() const;    ///< its size stands in 64 bits behind its type
     bool holdsMetaData() const; ///< by its type; at the top of a container it is the one whose children are streams

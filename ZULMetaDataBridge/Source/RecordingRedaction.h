@@ -84,9 +84,10 @@ public:
         FoundInCopy,     ///< something that was to go is in the copy, which must not be used
     };
 
+    /// `sentence` does not name the file.
     RedactionError(Reason reason, const std::string& sentence) : std::runtime_error(sentence), reason_(reason) {}
 
-    Reason reason() const { return reason_; } ///< `what()` is a sentence without the name of the file
+    Reason reason() const { return reason_; } ///< tells what can be done
 
 private:
     Reason reason_;

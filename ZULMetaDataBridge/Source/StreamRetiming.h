@@ -43,8 +43,8 @@ ZULMETADATA_API RetimedStream retimeStream(const StreamSource::Bytes& stream, co
 
 /// The least and the greatest finite time in a stream, both empty if it has none or nobody here knows where times are.
 struct TimeSpan {
-    std::optional<double> first;
-    std::optional<double> last;
+    std::optional<double> first;    ///< in seconds
+    std::optional<double> last;     ///< in seconds
     std::uint64_t entriesAfter = 0; ///< whose time is greater than the one that was asked for
 };
 
