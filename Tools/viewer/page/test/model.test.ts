@@ -56,7 +56,7 @@ test('an entry without an image shows the one that came with its number before',
   const [arrow, hand] = [Uint8Array.of(1), Uint8Array.of(2)];
   const track = new Track(
     entries('cursorImage', [0, 1, 2, 3, 4], {
-      id: BigInt64Array.of(9n, 7n, 8n, 7n, 8n),
+      id: BigUint64Array.of(9n, 7n, 8n, 7n, 8n),
       image: [null, arrow, hand, null, null],
       hotspotOffsetX: Int32Array.of(0, 5, 6, 0, 0),
       hotspotOffsetY: Int32Array.of(0, 3, 4, 0, 0),

@@ -216,7 +216,7 @@ function cursorImage(duration: number): Entries {
   }
   return entries('cursorImage', time, {
     image,
-    id: BigInt64Array.from(id),
+    id: BigUint64Array.from(id),
     hotspotOffsetX: Int32Array.from(image, (bytes) => (bytes ? 1 : 0)),
     hotspotOffsetY: Int32Array.from(image, (bytes) => (bytes ? 1 : 0)),
   });
