@@ -9,9 +9,9 @@ const keys = new Track({
   kind: 'keyboardAction',
   time: Float64Array.of(2, 2.5),
   columns: {
-    characterCode: Int32Array.of(72, 73),
+    characterCode: Uint32Array.of(72, 73),
     characterString: ['H', 'I'],
-    eventFlagsCode: Int32Array.of(0, 0),
+    eventFlagsCode: Uint32Array.of(0, 0),
     eventFlagsString: ['NONE', '<Shift>, "so"'],
   },
 });

@@ -93,9 +93,9 @@ function keyboardAction(duration: number): Entries {
     t += 3 + random() * 6;
   }
   return entries('keyboardAction', time, {
-    characterCode: Int32Array.from(codes),
+    characterCode: Uint32Array.from(codes),
     characterString: names,
-    eventFlagsCode: new Int32Array(codes.length),
+    eventFlagsCode: new Uint32Array(codes.length),
     eventFlagsString: flags,
   });
 }
