@@ -76,7 +76,7 @@ std::string unexpectedText(const CLI::App& app) {
 /// What is wrong with the values of an option, or with options that are given together, in words that say what to do.
 /// The parser's own words are all that tells these errors apart.
 std::string usageText(const CLI::ParseError& error) {
-    const std::string text = error.what();
+    std::string text = error.what();
     const auto has = [&text](const char* words) { return text.find(words) != std::string::npos; };
     const auto replaced = [&text](std::string_view words, const char* better) {
         const std::size_t position = text.find(words);

@@ -10,6 +10,7 @@
 #include <fmt/core.h>
 
 #include <algorithm>
+#include <bit>
 #include <cmath>
 #include <cstring>
 #include <limits>
@@ -36,7 +37,9 @@ struct DiffOptions {
 /// Whether two entries are the same but for their times. A time stands where both have their own at one place.
 bool areSameButForTime(const std::string& left, double leftTime, const std::string& right, double rightTime) {
     const auto holds = [](const std::string& bytes, std::size_t position, double time) {
-        return std::memcmp(bytes.data() + position, &time, sizeof time) == 0;
+        std::uint64_t stored = 0;
+        std::memcpy(&stored, bytes.data() + position, sizeof stored);
+        return stored == std::bit_cast<std::uint64_t>(time);
     };
     if (left.size() != right.size())
         return false;

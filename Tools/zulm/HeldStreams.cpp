@@ -74,6 +74,7 @@ CLI::Option* addStreamOption(CLI::App& command, std::vector<std::string>& kinds,
 void requireOneOf(const std::vector<uuid>& fitting, const std::string& option, const std::vector<std::string>& kinds,
                   const std::string& why) {
     std::vector<std::string> names;
+    names.reserve(fitting.size());
     for (const uuid& type : fitting)
         names.push_back(metaDataKindName(type));
     for (const std::string& kind : kinds)
