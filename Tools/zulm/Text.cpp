@@ -130,7 +130,7 @@ std::string shownMessage(std::string_view message) {
 }
 
 std::string shownJSON(const std::string& document) {
-    const auto isPlain = [](char c) { return c >= 0 && c < 0x7f; };
+    const auto isPlain = [](char c) { return static_cast<unsigned char>(c) < 0x7f; };
     if (std::all_of(document.begin(), document.end(), isPlain))
         return document;
     return eachShown(document, [](const TextPiece& piece, std::string_view) {
