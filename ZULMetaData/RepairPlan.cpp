@@ -1,5 +1,6 @@
 #include "ZULMetaData/RepairPlan.h"
 
+#include "SharedDependencies/ZCAPHeader.h"
 #include "ZULMetaData/AtomFormat.h"
 #include "ZULMetaData/PositionedInput.h"
 #include "ZULMetaData/StreamExtent.h"
@@ -111,6 +112,7 @@ private:
     void endInsideHeader(std::uint64_t position);
     bool beginsAppend(std::uint64_t position);
 
+    bool isFollowedByStrayBytes();
     bool mendTail(const Atom& last);
     void closeCutTail(const Atom& last);
     void setStrayBytesAside(std::uint64_t begin);
@@ -215,8 +217,8 @@ void Planner::walk() {
 }
 
 void Planner::endInsideHeader(std::uint64_t position) {
-    const bool isAppend = beginsAppend(position);
-    if (!isAppend && isOwn(previous_))
+    const bool isAppend = beginsAppend(position) && (!isOwn(previous_) || isFollowedByStrayBytes());
+    if (!isAppend && isFollowedByStrayBytes())
         return setStrayBytesAside(position);
     plan_.offset = position;
     plan_.finding = "the last " + bytesText(total_ - position) + ", from offset " + std::to_string(position) + " on, " +
@@ -240,13 +242,28 @@ bool Planner::beginsAppend(std::uint64_t position) {
             text(detail::extendedAtomHeader(detail::s_recordingInfoAtom, 0)).starts_with(rest));
 }
 
+/// Whether what follows the atom before belongs to nothing: the atom is one of this library, and its contents end where
+/// it does. If it was given a wrong size, its own streams would follow it.
+bool Planner::isFollowedByStrayBytes() {
+    if (!isOwn(previous_) || previous_.type == detail::s_recordingInfoAtom)
+        return isOwn(previous_) && previous_.size == detail::s_extendedAtomHeaderSize + sizeof(ZCAPHeader);
+    std::uint64_t end = previous_.start + detail::s_extendedAtomHeaderSize;
+    while (end < previous_.end()) {
+        const auto stream = streamAtomAt(end);
+        if (!stream)
+            return false;
+        end = stream->end();
+    }
+    return end == previous_.end();
+}
+
 /// Mends a last atom that does not fit into the file, if the atom or the one before it belongs to this library: a movie
 /// plays whatever stands there. Returns false for any other atom.
 bool Planner::mendTail(const Atom& last) {
     const bool isCutShort = last.size >= last.headerSize();
     if (isOwn(last) && isCutShort && last.start > 0)
         closeCutTail(last);
-    else if (isOwn(previous_) && !isMedia(last))
+    else if (isFollowedByStrayBytes() && !isMedia(last) && !isOwn(last))
         setStrayBytesAside(last.start);
     else
         return false;
@@ -315,10 +332,12 @@ bool Planner::isAppended(std::uint64_t position) {
 
 void Planner::closeOpenEnd(const Atom& last) {
     const std::uint64_t length = total_ - last.start;
-    if (!isReadable(last.type) && last.start > 0)
-        return setStrayBytesAside(last.start);
-    if (!isReadable(last.type))
+    if (!isReadable(last.type) && last.start == 0)
         return giveUp(last, "has an open end: the file does not begin like a movie");
+    if (isOwn(previous_) && !isFollowedByStrayBytes())
+        return giveUp(last, "has an open end, and the metadata before it ends in the middle of a stream");
+    if (!isReadable(last.type))
+        return setStrayBytesAside(last.start);
     if (length <= s_largestShortSize) {
         find(last, "has an open end");
         return change(last.start, text(detail::bigEndianBytes(static_cast<std::uint32_t>(length))),

@@ -71,6 +71,14 @@ TEST_F(RedactCommand, HidesTitlesInEveryContainer) {
     EXPECT_EQ(redacted(write("a.dat", appNameStream()), {"--titles", "(?i)nOT"}), hiddenNames());
 }
 
+TEST_F(RedactCommand, FindsTheStreamsAfterARIFFFileOf64BitSizes) {
+    const std::string body = chunk("data", "12345678");
+    const std::string sizes = le32(28) + le64(4 + 8 + 28 + body.size()) + le64(8) + le64(0) + le32(0);
+    const std::string wave = "RF64" + le32(0xffffffff) + "WAVE" + "ds64" + sizes + body;
+    EXPECT_EQ(redacted(write("wide.wav", wave + zulmChunk({appNameStream()})), {"--titles", "Not"}),
+              wave + zulmChunk({hiddenNames()}));
+}
+
 TEST_F(RedactCommand, LeavesNothingOfTheHiddenTextsInARecording) {
     const Json texts = Json::parse(runTool({"grep", ".", movie(), "--json"}).output)["files"][0]["matches"];
     ASSERT_FALSE(texts.empty());

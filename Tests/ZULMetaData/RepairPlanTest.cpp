@@ -431,6 +431,22 @@ TEST(RepairPlan, AlwaysComesToAnEnd) {
     }
 }
 
+TEST(RepairPlan, TouchesNothingAfterMetadataWithAWrongSize) {
+    const std::string streams = extendedAtom("DATA", locationStream()) + extendedAtom("DATA", appNameStream());
+    for (const auto missing : std::initializer_list<std::uint64_t>{1, 3, 8, 20, 60}) {
+        const std::string metaData = be32(1) + "ZULM" + be64(16 + streams.size() - missing) + streams;
+        const RepairPlan plan = planFor(media() + metaData);
+        EXPECT_EQ(plan.state, RepairPlan::Unrepairable) << missing;
+        EXPECT_TRUE(plan.changes.empty()) << missing;
+    }
+}
+
+TEST(RepairPlan, HidesNoMetadataWhoseSizeIsLessThanItsHeader) {
+    const std::string streams = extendedAtom("DATA", locationStream());
+    const std::string movie = media() + extendedAtom("ZULM", streams) + be32(1) + "ZULM" + be64(5) + streams;
+    EXPECT_EQ(planFor(movie).state, RepairPlan::Unrepairable);
+}
+
 } // namespace
 
 } // namespace ZULMetaData::Test

@@ -254,5 +254,13 @@ TEST(StreamRedaction, LeavesOutWhatHasNoHeader) {
     EXPECT_EQ(redacted("too short", {}).result.removal, RedactedStream::Headless);
 }
 
+TEST(StreamRedaction, KeepsNumbersThatAreNone) {
+    const float none = std::numeric_limits<float>::quiet_NaN();
+    const std::string usage = streamHeader("2b7b6a08", 1, 12) + f64(1) + raw(none) + f64(9) + raw(none);
+    const Redacted copy = redacted(usage, within(2, 3));
+    EXPECT_EQ(copy.bytes, usage);
+    EXPECT_EQ(copy.result.entriesChanged, 0U);
+}
+
 } // namespace
 } // namespace ZULMetaData::Test

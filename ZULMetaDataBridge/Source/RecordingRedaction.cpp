@@ -2,6 +2,7 @@
 
 #include "ZULMetaData/AtomFormat.h"
 #include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/ContainerRecognition.h"
 #include "ZULMetaData/RecordingInfo.h"
 #include "ZULMetaData/RepairPlan.h"
 #include "ZULMetaDataBridge/Source/Redaction/CopyCheck.h"
@@ -124,7 +125,7 @@ private:
 RecordingRedactor::Work::Work(std::istream& recording, MetaDataParser::StreamType type, RecordingRedaction redaction,
                               Progress progress)
     : recording_(recording), redaction_(std::move(redaction)), progress_(std::move(progress)),
-      parser_(MetaDataParser::create(recording, type)) {
+      parser_(openContainer(recording, type)) {
     if (!progress_)
         progress_ = [](Step, std::uint64_t, std::uint64_t) {};
     if (!parser_)

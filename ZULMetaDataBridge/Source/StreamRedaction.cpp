@@ -104,6 +104,9 @@ public:
     using Value = typename Kind::Value;
     static constexpr TimeRole s_role = roleOf<Kind>();
 
+    /// The values of other kinds stay what they are. They may be no numbers, which equal nothing.
+    static constexpr bool s_canChange = OneOf<Value, KeyStroke, std::string, CursorImage>;
+
     EntryRedactor(const Redaction& redaction, const std::set<std::string>& heldTexts, ReadBytes read,
                   RedactedStream& result, std::ostream& out)
         : redaction_(redaction), times_(redaction.removedTimes), heldTexts_(heldTexts), pictures_(std::move(read)),
@@ -155,7 +158,7 @@ private:
         const Value value = redacted(decoded.value);
         ++result_.entries;
         shownNow(value);
-        if (value == decoded.value) {
+        if (!s_canChange || value == decoded.value) {
             out_.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
             return;
         }

@@ -1,5 +1,6 @@
 #include "ZULMetaDataBridge/Source/Redaction/CopyCheck.h"
 
+#include "ZULMetaData/ContainerRecognition.h"
 #include "ZULMetaData/RecordingInfo.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
 #include "ZULMetaDataBridge/Source/Redaction/NullOutput.h"
@@ -108,7 +109,7 @@ void CopyCheck::requireNoTextStays(const MediaPlaces& media) const {
 
 void CopyCheck::requireClean(std::istream& copy, MetaDataParser::StreamType type,
                              const std::function<void(std::uint64_t)>& advance) const {
-    const auto parser = MetaDataParser::create(copy, type);
+    const auto parser = openContainer(copy, type);
     if (!parser)
         throw RedactionError(Reason::CannotWrite, "the copy cannot be read back");
     for (const StreamPart& stream : streamsIn(*parser))

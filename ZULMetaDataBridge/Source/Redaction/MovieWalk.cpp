@@ -81,6 +81,8 @@ private:
     std::istream& movie_;
     ReadBytes read_;
     std::uint64_t total_;
+    std::uint64_t textSamples_ = 0; ///< of all tracks of texts so far, which may share their samples
+    std::uint64_t textBytes_ = 0;
     MediaPlaces places_;
     std::vector<MovieTrack> tracks_;
     std::set<std::uint64_t> chapterTracks_; ///< that other tracks refer to
@@ -271,13 +273,13 @@ std::string MovieWalk::whyUnreadable(const MovieTrack& track) {
     if (isFragmented_)
         return "has its texts in fragments";
     constexpr std::uint64_t most = 1 << 20; // nobody reads more texts
-    std::uint64_t count = 0;
-    std::uint64_t bytes = 0;
+    const auto isBounded = [this] { return textSamples_ <= most && textBytes_ <= total_; };
     const bool isKnown = visitSamples(track, read_, [&](const SampleRange& sample) {
-        bytes += sample.size;
-        return ++count <= most && bytes <= total_;
+        textBytes_ += sample.size;
+        ++textSamples_;
+        return isBounded();
     });
-    return isKnown && count <= most && bytes <= total_ ? "" : "does not say where its texts are";
+    return isKnown && isBounded() ? "" : "does not say where its texts are";
 }
 
 bool MovieWalk::isInMediaData(const SampleRange& sample) const {

@@ -317,10 +317,11 @@ export class App {
   }
 }
 
-/// Without the name of the file in front, where the sentence has it already.
+/// Without the name of the file in front, where the sentence has it already. A clause about the file gets its subject.
 function wordsOf(error: unknown, name = ''): string {
   const words = (error instanceof Error ? error.message : String(error)).replace(/\.$/, '');
-  return name && words.startsWith(`${name}: `) ? words.slice(name.length + 2) : words;
+  const clause = name && words.startsWith(`${name}: `) ? words.slice(name.length + 2) : words;
+  return /^(begins|is) /.test(clause) ? `it ${clause}` : clause;
 }
 
 const firstAtoms = /^(ftyp|mdat|moov|free|skip|wide|RIFF)$/;
