@@ -62,9 +62,13 @@ OutputFile::OutputFile(const std::string& path, const std::vector<std::string>& 
     for (const std::string& input : inputs)
         if (isInput(path, input))
             throw Failure(fmt::format("{}: is the input {} itself; choose another output", path, input));
-    if (fs::exists(path) && !fs::is_regular_file(path))
+    std::error_code error;
+    const fs::file_status status = fs::status(path, error);
+    if (error && status.type() != fs::file_type::not_found)
+        throw Failure(fmt::format("{}: {}", path, error.message()));
+    if (fs::exists(status) && !fs::is_regular_file(status))
         throw Failure(fmt::format("{}: not a regular file; choose another output", path));
-    if (fs::exists(path) && !force)
+    if (fs::exists(status) && !force)
         throw Failure(existsText(path));
     access_ = std::make_unique<FileAccess>(path, inputs);
     temporary_ = newTemporary(path);
@@ -90,8 +94,8 @@ void OutputFile::copyFrom(const std::string& source, std::uint64_t offset, std::
 }
 
 void OutputFile::commit() {
-    access_->applyTo(temporaryPath());
     sync(temporaryPath());
+    access_->applyTo(temporaryPath()); // last: it may take the right to open the file
     putInPlace();
     temporary_->release();
     const fs::path folder = fs::path(path_).parent_path();

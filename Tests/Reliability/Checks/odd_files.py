@@ -25,6 +25,7 @@ PAGE = "Page.html"
 
 NOT_THERE = (1, "no such file")
 NO_FILE = (1, "not a regular file")
+A_FOLDER = (1, "is a folder")
 NO_RIGHT = (1, "Permission denied")
 TOO_LONG = (1, "File name too long")
 A_LOOP = (1, "Too many levels of symbolic links")
@@ -33,7 +34,7 @@ FINE = (0, "")
 # For each odd thing: read by a command, changed in place, replaced as an output.
 TOOL = {
     "nothing": (NOT_THERE, NOT_THERE, FINE),
-    "folder": (NO_FILE, NO_FILE, NO_FILE),
+    "folder": (A_FOLDER, A_FOLDER, NO_FILE),
     "pipe": (NO_FILE, NO_FILE, NO_FILE),
     "link to a pipe": (NO_FILE, NO_FILE, NO_FILE),
     "device": (NO_FILE, NO_FILE, NO_FILE),
@@ -114,8 +115,8 @@ AS_USUAL = dict(write=WROTE, read="11 entries", parse="1 streams", scale="1.0000
                 **{"append-from": "true", "append-memory": "done", "attach-from": "1 attached"})
 CREATED = UNOPENED | dict(write=WROTE, append="true", stamp="done")
 NO_REGULAR_FILE = "throws: {}: is not a regular file"
-EMPTY = UNOPENED | dict(parse="0 streams", validate="sound", finalize="true", append="true", stamp="done", plan="whole",
-                        attach=NO_REGULAR_FILE, **{"append-from": "true"})
+EMPTY = UNOPENED | dict(parse="0 streams", validate="throws: begins neither", finalize="true", append="true",
+                        stamp="done", plan="whole", attach=NO_REGULAR_FILE, **{"append-from": "true"})
 LIBRARY = {
     "nothing": CREATED,
     "folder": UNOPENED | {"parse": "0 streams", "validate": "throws: cannot be read", "append-from": "true",
