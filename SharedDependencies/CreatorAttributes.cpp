@@ -35,8 +35,8 @@ std::string load(const char (&field)[Size]) {
 
 template <std::size_t Size>
 std::string loadWhole(const char (&field)[Size]) {
-    const std::string_view whole(field, Size);
-    return std::string(whole.substr(0, whole.find_last_not_of('\0') + 1));
+    const auto end = std::find_if(std::rbegin(field), std::rend(field), [](char c) { return c != '\0'; });
+    return {std::begin(field), end.base()};
 }
 
 } // namespace
