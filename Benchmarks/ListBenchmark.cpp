@@ -41,7 +41,7 @@ std::size_t decode() {
     MetaDataObserver<Point> observer;
     CursorLocationMetaDataParser parser(s_movie);
     const auto bytes = parser.getMetaDataStream(s_cursorLocationUUID);
-    MetaDataParser::create(*bytes, MetaDataParser::RawStream)->loadDataType(s_cursorLocationUUID, observer, 1);
+    MetaDataParser::create(*bytes, Container::RawStream)->loadDataType(s_cursorLocationUUID, observer, 1);
     return observer.values.size();
 }
 

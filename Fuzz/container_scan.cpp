@@ -2,10 +2,10 @@
 // come to an end.
 
 #include "Fuzz/Target.h"
-#include "ZULMetaData/ContainerLayout.h"
-#include "ZULMetaData/MovieDuration.h"
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
+#include "ZULMetaData/Containers/MovieDuration.h"
 #include "ZULMetaDataBridge/Source/StreamSalvage.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
 #include <map>
 #include <sstream>

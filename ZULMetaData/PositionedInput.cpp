@@ -1,6 +1,6 @@
 #include "ZULMetaData/PositionedInput.h"
 
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
 
 #include <limits>
 

@@ -1,7 +1,7 @@
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
-#include "ZULMetaData/ContainerScan.h"
-#include "ZULMetaData/FileParser.h"
+#include "ZULMetaData/Containers/ContainerScan.h"
+#include "ZULMetaData/Containers/FileParser.h"
 #include "ZULMetaData/PositionedInput.h"
 
 #include <algorithm>

@@ -6,6 +6,9 @@
 //         parser->loadDataType<Point>(s_cursorLocationUUID, observer, -1);
 
 #include "../SharedDependencies/Export.h"
+#include "Containers/ContainerType.h"
+#include "Containers/MP4MetaData.h"
+#include "Containers/Util.h"
 #include "ZULMMetaDataReader.h"
 
 #include <cstdint>
@@ -21,8 +24,8 @@ namespace ZULMetaData {
 /// single read position, so calls must not overlap.
 class ZULMETADATA_API MetaDataParser {
 public:
-    /// The types of files: RIFF chunks, the atoms of a movie, or a stream file without a container.
-    enum StreamType : std::int32_t { Unknown, Riff, QuickTime, RawStream };
+    using StreamType = Container::Type; ///< `Container::Riff` and the other names of the types are valid too
+    using enum Container::Type;
 
     /// The place of a stream. Both numbers are 0 for a kind that the file does not have. The length is the one that the
     /// container declares; it may be larger than the file.
@@ -101,32 +104,6 @@ ZULMETADATA_API bool readChunkTypeAndSize(std::istream& stream, std::uint64_t to
                                           std::uint32_t& size);
 
 } // namespace ParserUtil
-
-/// Appends streams to a movie as one `ZULM` atom of `DATA` atoms. An incomplete entry at the end of a stream is left
-/// out, but the size of the `DATA` atom includes it. If entries vary in size and one has a size of 0, both functions
-/// throw `std::runtime_error` "Got an entry size of 0". The atom then keeps a size of 0, which `finalizeAtomsInFile`
-/// repairs.
-struct ZULMETADATA_API MP4MetaData {
-    /// Appends stream files. If the movie or a stream file cannot be opened, prints a line on standard output and
-    /// returns false. The other streams are appended anyway.
-    static bool appendMetaDataFiles(const std::string& path, const std::vector<std::string>& files);
-
-    /// Appends streams from memory, in ascending order of their kinds. Failures are not reported.
-    static void appendMetaData(const std::string& path, const std::map<uuid, std::string>& streams);
-};
-
-/// Operations on a finished movie.
-struct ZULMETADATA_API Util {
-    /// Sets the size of the last atom in a movie that was not finished. Returns true if the atoms fill the file
-    /// afterwards. An atom without a size that has 4 GiB or more needs the 8 spare bytes of a `wide` atom before it. It
-    /// then gets the length that it had without them, which is 8 bytes less than its real length.
-    static bool finalizeAtomsInFile(const std::string& path);
-
-    /// Returns the last value in the stream of the scale factor, read as a 64-bit floating-point number, or 1.0 if
-    /// there is none. The stream holds integers, so the result is meaningless; read it with
-    /// `ScaleFactorMetaDataParser`.
-    static double recordingScaleForMP4AtPath(const std::string& path);
-};
 
 // ---------------------------------------------------------------------------------------------------------------
 

@@ -2,13 +2,13 @@
 
 // Includes the whole stream core: values, streams, containers.
 
-#include "ContainerLayout.h"
-#include "ContainerRecognition.h"
+#include "Containers/ContainerLayout.h"
+#include "Containers/ContainerRecognition.h"
+#include "Containers/MovieDuration.h"
+#include "Containers/RecordingInfo.h"
+#include "Containers/RepairPlan.h"
 #include "CursorImageSchema.h"
 #include "CursorImageWriter.h"
-#include "MovieDuration.h"
-#include "RecordingInfo.h"
-#include "RepairPlan.h"
 #include "StreamEntries.h"
 #include "StreamExtent.h"
 #include "ZULMMetaDataCommon.h"

@@ -8,7 +8,7 @@
 #include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Text.h"
 #include "Tools/zulm/VerifyReport.h"
-#include "ZULMetaData/ContainerRecognition.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaDataBridge/Source/StoredFields.h"
 
 #include <fmt/core.h>
@@ -39,7 +39,7 @@ using namespace ZULMetaData::Bindings;
 
 /// In the order in which they need each other.
 struct ZulmRecording {
-    ZulmRecording(ReadSlice read, std::uint64_t size, MetaDataParser::StreamType type, const std::string& name)
+    ZulmRecording(ReadSlice read, std::uint64_t size, Container::Type type, const std::string& name)
         : buffer(std::move(read), size), input(&buffer), recording(input, type, name) {}
 
     SliceBuffer buffer;
@@ -105,11 +105,11 @@ ReadSlice readingWith(ZulmReadAt readAt, void* context) {
     };
 }
 
-MetaDataParser::StreamType typeOf(const ReadSlice& read, std::uint64_t fileSize, const std::string& name) {
+Container::Type typeOf(const ReadSlice& read, std::uint64_t fileSize, const std::string& name) {
     std::array<char, s_recognitionBytes> first;
     const std::size_t size = Zulm::orUnreadable(name, [&] { return read(0, first.data(), first.size()); });
     const RecognizedContainer recognized = recognizeContainer({first.data(), size}, fileSize, name);
-    if (recognized.type == MetaDataParser::Unknown)
+    if (recognized.type == Container::Unknown)
         throw Zulm::Failure(fmt::format("{}: {}", name, recognized.refusal()));
     return recognized.type;
 }

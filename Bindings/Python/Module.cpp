@@ -4,14 +4,14 @@
 #include "Bindings/Python/FileError.h"
 #include "Bindings/Python/PythonTexts.h"
 #include "Bindings/Python/StreamWriter.h"
-#include "ZULMetaData/ContainerRecognition.h"
-#include "ZULMetaData/MovieDuration.h"
-#include "ZULMetaData/RecordingInfo.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaData/Containers/MovieDuration.h"
+#include "ZULMetaData/Containers/RecordingInfo.h"
 #include "ZULMetaDataBridge/Source/HumanReadableActions.h"
 #include "ZULMetaDataBridge/Source/KeyNames.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
 #include <pybind11/numpy.h>
 #include <pybind11/pybind11.h>
@@ -68,16 +68,14 @@ public:
     }
 
     std::string container() const {
-        return container_ == MetaDataParser::QuickTime ? "movie"
-               : container_ == MetaDataParser::Riff    ? "riff"
-                                                       : "stream";
+        return container_ == Container::QuickTime ? "movie" : container_ == Container::Riff ? "riff" : "stream";
     }
     std::optional<double> duration() const { return duration_; }
     const std::vector<CreatorAttributes>& creators() const { return creators_; }
     const std::vector<RecordedStream>& streams() const { return streams_; }
 
 private:
-    MetaDataParser::StreamType container_ = MetaDataParser::Unknown;
+    Container::Type container_ = Container::Unknown;
     std::optional<double> duration_;
     std::vector<CreatorAttributes> creators_;
     std::vector<RecordedStream> streams_;

@@ -3,7 +3,7 @@
 #include "Tests/Support/Bytes.h"
 #include "Tests/Tools/RecordedSession.h"
 #include "Tests/Tools/ToolRun.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "ZULMetaData/ZULMetaData.h"
 
 #include <gmock/gmock.h>

@@ -2,7 +2,7 @@
 
 #include "Tests/Tools/RecordedSession.h"
 #include "Tests/Tools/ToolRun.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

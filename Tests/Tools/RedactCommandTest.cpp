@@ -1,6 +1,6 @@
 #include "Tests/Tools/RecordedSession.h"
 #include "Tests/Tools/ToolRun.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
 #include <gmock/gmock.h>

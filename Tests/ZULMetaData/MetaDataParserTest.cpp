@@ -2,7 +2,7 @@
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "Tests/ZULMetaData/WatchedStream.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 

@@ -3,7 +3,7 @@
 // What comes of reading a stream, written down so that a test can spell it out.
 
 #include "Tests/Support/Bytes.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "ZULMetaData/ZULMMetaDataReader.h"
 
 #include <cstddef>

@@ -1,6 +1,6 @@
 #include "ZULMetaData/StreamEntries.h"
 
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 
 #include <gtest/gtest.h>
 

@@ -3,8 +3,8 @@
 #include "ZULMetaData/StreamExtent.h"
 
 #include "Tests/Support/Bytes.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
-#include "ZULMetaData/RepairPlan.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
+#include "ZULMetaData/Containers/RepairPlan.h"
 
 #include <gtest/gtest.h>
 

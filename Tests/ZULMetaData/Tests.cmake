@@ -1,20 +1,20 @@
 zulm_add_tests(ZULMetaDataTests
-  AtomRepairTest
-  ContainerLayoutTest
-  ContainerRecognitionTest
-  ContainerScanTest
+  Containers/AtomRepairTest
+  Containers/ContainerLayoutTest
+  Containers/ContainerRecognitionTest
+  Containers/ContainerScanTest
   FileInputBufferTest
-  MP4MetaDataTest
+  Containers/MP4MetaDataTest
   MetaDataParserTest
-  MovieDurationTest
+  Containers/MovieDurationTest
   ParserUtilTest
-  RecordingInfoTest
-  RepairPlanTest
-  SmallAtomsTest
+  Containers/RecordingInfoTest
+  Containers/RepairPlanTest
+  Containers/SmallAtomsTest
   StreamEntriesTest
   StreamExtentTest
   ValueTypesTest
-  WideRIFFTest
+  Containers/WideRIFFTest
   ZULMMetaDataUUIDsTest
   ZULMMetaDataWriterTest)
 

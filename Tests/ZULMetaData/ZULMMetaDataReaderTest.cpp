@@ -5,7 +5,7 @@
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
 #include "Tests/Support/MemoryWatch.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "Tests/ZULMetaData/ReadStream.h"
 #include "Tests/ZULMetaData/StandardOutput.h"
 

@@ -2,7 +2,7 @@
 
 #include "Tests/Support/InvalidCorpus.h"
 #include "Tests/Support/Files.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "Tests/ZULMetaDataBridge/KindSamples.h"
 #include "ZULMetaData/ZULMetaData.h"
 

@@ -3,7 +3,7 @@
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "ZULMetaDataBridge/Source/ZULMAtomRepair.h"
 #include "ZULMetaDataBridge/Source/ZULMAtomWriter.h"
 #include "ZULMetaDataBridge/Source/ZULRAtomWriter.h"

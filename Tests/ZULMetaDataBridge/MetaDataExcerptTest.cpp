@@ -1,8 +1,8 @@
 #include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 
 #include "Tests/Support/Bytes.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
-#include "ZULMetaData/RecordingInfo.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
+#include "ZULMetaData/Containers/RecordingInfo.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

@@ -1,10 +1,10 @@
 // What is well is left alone, what is worth knowing is said, and nothing that a file says leads astray. What is wrong
 // with the invalid recordings stands in InvalidCorpusTest.
 
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 #include "Tests/Support/Files.h"
 #include "Tests/Support/MemoryWatch.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "Tests/ZULMetaData/WatchedStream.h"
 #include "Tests/ZULMetaDataBridge/KindSamples.h"
 

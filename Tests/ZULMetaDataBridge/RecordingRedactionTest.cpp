@@ -1,7 +1,7 @@
 #include "ZULMetaDataBridge/Source/RecordingRedaction.h"
 
 #include "Tests/Support/Files.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>

@@ -5,7 +5,7 @@
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/FileSizeLimit.h"
 #include "Tests/Support/Files.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "ZULMetaData/ZULMetaData.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 

@@ -3,7 +3,7 @@
 #include "ZULMetaDataBridge/Source/StreamRetiming.h"
 
 #include "Tests/Support/Bytes.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 
 #include <gtest/gtest.h>
 

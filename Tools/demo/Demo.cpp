@@ -1,7 +1,7 @@
 #include "Tools/demo/Demo.h"
 
 #include "Tools/demo/Session.h"
-#include "ZULMetaData/RecordingInfo.h"
+#include "ZULMetaData/Containers/RecordingInfo.h"
 
 #include <fmt/core.h>
 

@@ -2,7 +2,7 @@
 
 #include "Platform/Image.h"
 #include "Tools/demo/Session.h"
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
 
 #include <cstdint>
 #include <initializer_list>

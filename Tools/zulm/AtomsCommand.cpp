@@ -84,7 +84,7 @@ void print(Recording& recording, const LayoutVisitor& ends) {
 ExitCode showAtoms(const std::string& path, RunReport& report) {
     const InputFile input(path);
     Recording recording(input.path(), input.name());
-    if (recording.parser().getStreamType() == MetaDataParser::RawStream)
+    if (recording.parser().getStreamType() == Container::RawStream)
         throw Failure(
             fmt::format("{}: a bare stream has no atoms; 'zulm info {}' shows what it is", path, shellWord(path)));
     ExitCode code = ExitFine;

@@ -48,9 +48,9 @@ uuid typeOfStreamFile(const std::string& path) {
     requireFile(path);
     std::ifstream file = openInput(path);
     const RecognizedContainer recognized = orUnreadable(path, [&] { return recognizeContainer(file, path); });
-    if (recognized.type == MetaDataParser::RawStream)
+    if (recognized.type == Container::RawStream)
         return Recording(path).parser().getAvailableMetaDataUUIDs().front();
-    if (recognized.type == MetaDataParser::Unknown)
+    if (recognized.type == Container::Unknown)
         throw Failure(fmt::format("{}: not a stream file (.dat): it {}", path, recognized.refusal()));
     throw Failure(
         fmt::format("{}: not a stream file (.dat) but a {}; '--from {}' carries the streams of a recording over", path,
@@ -80,8 +80,8 @@ void complainAboutOldMovie(const std::string& path, const std::string& what, Str
 /// Where the children of a metadata atom or chunk do not end where it does, not all of them were found.
 bool hasUnreachableStreams(Recording& recording) {
     std::istream& stream = recording.parser().getStream();
-    const MetaDataParser::StreamType container = recording.parser().getStreamType();
-    const bool isMovie = container == MetaDataParser::QuickTime;
+    const Container::Type container = recording.parser().getStreamType();
+    const bool isMovie = container == Container::QuickTime;
     const std::uint64_t total = recording.size();
     for (const ContainerItem& item : listTopLevel(stream, container)) {
         if (item.type != "ZULM")

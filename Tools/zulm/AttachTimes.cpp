@@ -4,7 +4,7 @@
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Recording.h"
 #include "Tools/zulm/TemporaryFile.h"
-#include "ZULMetaData/MovieDuration.h"
+#include "ZULMetaData/Containers/MovieDuration.h"
 
 #include <fmt/core.h>
 
@@ -89,7 +89,7 @@ ExitCode RetimedSources::complainAboutCuts() const {
 
 std::optional<double> durationOfMovie(const std::string& path) {
     std::ifstream movie = openInput(path);
-    const auto duration = movieDuration(movie, MetaDataParser::QuickTime);
+    const auto duration = movieDuration(movie, Container::QuickTime);
     requireRead(movie, path);
     return duration;
 }

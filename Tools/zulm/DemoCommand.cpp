@@ -44,7 +44,7 @@ std::string makeMovie(const DemoOptions& options) {
 ExitCode runDemo(const DemoOptions& options) {
     if (!options.movie.empty()) {
         requireFile(options.movie);
-        if (MetaDataParser::streamTypeOf(options.movie) != MetaDataParser::QuickTime)
+        if (MetaDataParser::streamTypeOf(options.movie) != Container::QuickTime)
             throw Failure(fmt::format("{}: not a movie (.mp4, .mov, .zcap)", options.movie));
     }
     fs::create_directories(options.folder);

@@ -2,7 +2,7 @@
 
 // What validating a file has found, for a person and for a program.
 
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
 #include <nlohmann/json.hpp>
 

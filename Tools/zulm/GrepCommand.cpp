@@ -202,7 +202,7 @@ private:
             return;
         if (entry.is_directory())
             searchFolder(path);
-        else if (entry.is_regular_file() && MetaDataParser::streamTypeOf(path) != MetaDataParser::Unknown)
+        else if (entry.is_regular_file() && MetaDataParser::streamTypeOf(path) != Container::Unknown)
             search(path);
     }
 

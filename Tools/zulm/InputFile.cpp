@@ -3,7 +3,7 @@
 #include "Platform/Descriptor.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/TemporaryFile.h"
-#include "ZULMetaData/ContainerRecognition.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
 
 #include <fmt/core.h>
 

@@ -72,7 +72,7 @@ private:
         visitor_.childrenEnd();
     }
 
-    bool isMovie() const { return parser_.getStreamType() == MetaDataParser::QuickTime; }
+    bool isMovie() const { return parser_.getStreamType() == Container::QuickTime; }
     const char* what() const { return isMovie() ? "atom" : "chunk"; }
 
     void visit(std::uint64_t begin, std::uint64_t end, const ContainerVisitor& visitor) {
@@ -146,7 +146,7 @@ std::string LayoutItem::headerForm() const {
 }
 
 void walkLayout(Recording& recording, LayoutPart part, const LayoutVisitor& visitor) {
-    if (recording.parser().getStreamType() != MetaDataParser::RawStream)
+    if (recording.parser().getStreamType() != Container::RawStream)
         Walk(recording, part, visitor).run();
 }
 

@@ -1,7 +1,7 @@
 #include "Tools/zulm/Manual.h"
 
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
 #include <fmt/core.h>
 

@@ -2,7 +2,7 @@
 
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Text.h"
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
 
 #include <fmt/core.h>
 
@@ -80,7 +80,7 @@ void inPieces(const ReadBytes& read, const std::string& name, std::uint64_t offs
 MetaDataTail::MetaDataTail(Recording& recording, KeptMetaData kept)
     : recording_(recording), kept_(kept), size_(recording.size()) {
     MetaDataParser& parser = recording_.parser();
-    if (parser.getStreamType() == MetaDataParser::RawStream)
+    if (parser.getStreamType() == Container::RawStream)
         throw Failure(fmt::format("{}: is a stream alone, without a movie around it", recording_.name()));
     items_ = listTopLevel(parser.getStream(), parser.getStreamType());
     requireRead(parser.getStream(), recording_.name());
@@ -95,7 +95,7 @@ MetaDataTail::MetaDataTail(Recording& recording, KeptMetaData kept)
 }
 
 bool MetaDataTail::isMovie() const {
-    return recording_.parser().getStreamType() == MetaDataParser::QuickTime;
+    return recording_.parser().getStreamType() == Container::QuickTime;
 }
 
 void MetaDataTail::requireWholeContainer() const {

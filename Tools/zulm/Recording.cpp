@@ -37,7 +37,7 @@ void examine(StreamInfo& info, const StreamReport& report) {
 
 } // namespace
 
-Recording::Recording(std::istream& input, MetaDataParser::StreamType type, std::string name) : name_(std::move(name)) {
+Recording::Recording(std::istream& input, Container::Type type, std::string name) : name_(std::move(name)) {
     parser_ = orUnreadable(name_, [&] { return openContainer(input, type); });
     requireRead(parser_->getStream(), name_);
 }
@@ -113,15 +113,15 @@ void requireRead(const std::istream& stream, const std::string& name) {
     orUnreadable(name, [&stream] { requireReadable(stream); });
 }
 
-bool isNamedOtherwise(const std::string& path, MetaDataParser::StreamType type) {
-    const MetaDataParser::StreamType named = MetaDataParser::streamTypeOf(path);
-    return named != MetaDataParser::Unknown && named != type;
+bool isNamedOtherwise(const std::string& path, Container::Type type) {
+    const Container::Type named = MetaDataParser::streamTypeOf(path);
+    return named != Container::Unknown && named != type;
 }
 
-std::string containerName(MetaDataParser::StreamType type) {
+std::string containerName(Container::Type type) {
     switch (type) {
-    case MetaDataParser::QuickTime: return "movie";
-    case MetaDataParser::Riff: return "RIFF";
+    case Container::QuickTime: return "movie";
+    case Container::Riff: return "RIFF";
     default: return "stream";
     }
 }

@@ -5,7 +5,7 @@
 #include "Tools/zulm/Failure.h"
 #include "ZULMetaData/StreamExtent.h"
 #include "ZULMetaData/ZULMetaData.h"
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
 #include <fmt/core.h>
@@ -74,7 +74,7 @@ public:
     explicit Recording(std::string path, std::string name = {});
 
     /// Over an input of the caller that holds a container of this type, and that must outlive this.
-    Recording(std::istream& input, ZULMetaData::MetaDataParser::StreamType type, std::string name);
+    Recording(std::istream& input, ZULMetaData::Container::Type type, std::string name);
 
     /// Empty for an input of the caller.
     const std::string& path() const { return path_; }
@@ -126,15 +126,14 @@ private:
 };
 
 /// Whether a file's name tells another container than its contents do, so that programs that go by the name fail.
-bool isNamedOtherwise(const std::string& path, ZULMetaData::MetaDataParser::StreamType type);
+bool isNamedOtherwise(const std::string& path, ZULMetaData::Container::Type type);
 
 /// Throws `Failure` if the name of `output`, which gets a container of this type, tells another one. Warns if programs
 /// that go by the name find no metadata in `output` though they did in `input`.
-void requireOutputName(const std::string& output, ZULMetaData::MetaDataParser::StreamType type,
-                       const std::string& input);
+void requireOutputName(const std::string& output, ZULMetaData::Container::Type type, const std::string& input);
 
 /// "movie", "RIFF" or "stream".
-std::string containerName(ZULMetaData::MetaDataParser::StreamType type);
+std::string containerName(ZULMetaData::Container::Type type);
 
 /// The name of a registered kind, else null.
 nlohmann::ordered_json kindDocument(const ZULMetaData::uuid& type);

@@ -28,12 +28,12 @@ Recording::Recording(std::string path, std::string name) : path_(std::move(path)
     say(fmt::format("{}: {} with {} streams", name_, container(), parser_->getAvailableMetaDataUUIDs().size()));
 }
 
-void requireOutputName(const std::string& output, MetaDataParser::StreamType type, const std::string& input) {
+void requireOutputName(const std::string& output, Container::Type type, const std::string& input) {
     if (isNamedOtherwise(output, type))
         throw Failure(fmt::format("{}: is named as a {} is, but would hold a {}; choose a name that ends in {}", output,
                                   containerName(MetaDataParser::streamTypeOf(output)), containerName(type),
                                   extensionFor(type)));
-    const bool isUnnamed = MetaDataParser::streamTypeOf(output) == MetaDataParser::Unknown;
+    const bool isUnnamed = MetaDataParser::streamTypeOf(output) == Container::Unknown;
     if (isUnnamed && MetaDataParser::streamTypeOf(input) == type)
         warn(fmt::format("{}: programs that go by the name do not take it for a {}; one that ends in {} is safe",
                          output, containerName(type), extensionFor(type)));

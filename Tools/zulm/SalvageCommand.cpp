@@ -40,7 +40,7 @@ SalvageReport search(const std::string& path) {
     std::ifstream file = openInput(path);
     Progress progress("searching " + path, std::filesystem::file_size(path));
     return orUnreadable(path, [&] {
-        const MetaDataParser::StreamType type = recognizeContainer(file, path).type; // unknown ones are searched, too
+        const Container::Type type = recognizeContainer(file, path).type; // unknown ones are searched, too
         return StreamSalvage(file, type, [&](std::uint64_t done) { progress.moveTo(done); }).run();
     });
 }

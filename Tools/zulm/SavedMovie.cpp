@@ -83,7 +83,7 @@ SavedMovie::SavedMovie(const SaveOptions& options, const std::vector<std::string
     : name_(options.inPlace ? options.movie : options.output), subject_(options.movie), path_(options.movie) {
     requireFile(options.movie);
     if (!options.inPlace)
-        requireOutputName(name_, MetaDataParser::QuickTime, options.movie);
+        requireOutputName(name_, Container::QuickTime, options.movie);
     if (options.inPlace)
         requireFile(options.movie, true);
     requireRepairable(options.movie);

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
 #include <nlohmann/json.hpp>
 

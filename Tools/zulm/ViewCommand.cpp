@@ -108,7 +108,7 @@ void writePage(OutputFile& file, const ViewOptions& options, const InputFile& in
 
 /// Where the page finds the movie; null where there is none to show.
 Json movieFor(const ViewOptions& options, const InputFile& input, Recording& recording) {
-    const bool isStream = recording.parser().getStreamType() == MetaDataParser::RawStream;
+    const bool isStream = recording.parser().getStreamType() == Container::RawStream;
     if (isStream && options.embed)
         throw Failure(fmt::format("{}: is a stream alone, without a movie to embed", input.name()));
     if (options.embed && recording.size() > s_mostEmbedded)

@@ -48,7 +48,7 @@ std::string relativeAddress(const std::string& file, const std::string& folder) 
 }
 
 std::string embeddedAddress(const Recording& recording) {
-    const bool isWave = recording.container() == containerName(MetaDataParser::Riff);
+    const bool isWave = recording.container() == containerName(Container::Riff);
     return fmt::format("data:{};base64,", isWave ? "audio/wav" : "video/mp4");
 }
 

@@ -1,6 +1,6 @@
 #include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 
-#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/StreamExtent.h"
 
 #include <algorithm>
@@ -36,7 +36,7 @@ std::string metaDataExcerpt(MetaDataParser& recording) {
     std::istream& stream = recording.getStream();
     const std::uint64_t total = sizeOfInput(stream);
     const ReadBytes read = readingFrom(stream);
-    if (recording.getStreamType() == MetaDataParser::RawStream)
+    if (recording.getStreamType() == Container::RawStream)
         return bytesOf(read, total, 0, total);
     const std::vector<ContainerItem> items = listTopLevel(stream, recording.getStreamType());
     requireReadable(stream);
@@ -46,7 +46,7 @@ std::string metaDataExcerpt(MetaDataParser& recording) {
             excerpt += emptyRIFF(bytesOf(read, total, 0, item.headerSize + 4));
         if (item.type == "ftyp" || item.type == "ZULR" || item.holdsMetaData())
             excerpt += bytesOf(read, total, item.offset, std::max(item.end(), item.offset));
-        if (recording.getStreamType() == MetaDataParser::Riff)
+        if (recording.getStreamType() == Container::Riff)
             excerpt.resize(excerpt.size() + excerpt.size() % 2);
     }
     return excerpt;

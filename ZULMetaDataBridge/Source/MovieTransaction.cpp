@@ -1,6 +1,6 @@
 #include "ZULMetaDataBridge/Source/MovieTransaction.h"
 
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
 
 namespace ZULMetaData {
 

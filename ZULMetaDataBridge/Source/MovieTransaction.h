@@ -3,7 +3,7 @@
 // Changes to a movie that can all be undone: bytes that are replaced, and atoms that are appended.
 
 #include "Platform/DurableFile.h"
-#include "ZULMetaData/RepairPlan.h"
+#include "ZULMetaData/Containers/RepairPlan.h"
 
 #include <cstdint>
 #include <optional>

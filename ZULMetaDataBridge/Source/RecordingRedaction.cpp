@@ -1,10 +1,10 @@
 #include "ZULMetaDataBridge/Source/RecordingRedaction.h"
 
-#include "ZULMetaData/AtomFormat.h"
-#include "ZULMetaData/ContainerLayout.h"
-#include "ZULMetaData/ContainerRecognition.h"
-#include "ZULMetaData/RecordingInfo.h"
-#include "ZULMetaData/RepairPlan.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaData/Containers/RecordingInfo.h"
+#include "ZULMetaData/Containers/RepairPlan.h"
 #include "ZULMetaDataBridge/Source/Redaction/CopyCheck.h"
 #include "ZULMetaDataBridge/Source/Redaction/MediaCopy.h"
 #include "ZULMetaDataBridge/Source/Redaction/NullOutput.h"
@@ -75,15 +75,15 @@ void patch(std::ostream& out, std::uint64_t offset, const std::array<char, size>
 
 class RecordingRedactor::Work {
 public:
-    Work(std::istream& recording, MetaDataParser::StreamType type, RecordingRedaction redaction, Progress progress);
+    Work(std::istream& recording, Container::Type type, RecordingRedaction redaction, Progress progress);
 
     bool isEmpty() const { return streams_.empty() && places_.empty(); }
     RedactedRecording preview();
     RedactedRecording write(const FileLocation& copy);
 
 private:
-    MetaDataParser::StreamType container() const { return parser_->getStreamType(); }
-    bool isMovie() const { return container() == MetaDataParser::QuickTime; }
+    Container::Type container() const { return parser_->getStreamType(); }
+    bool isMovie() const { return container() == Container::QuickTime; }
 
     void choosePlaces();
     void addPlace(RedactedPlace::Reason reason, const detail::MediaPlace& place);
@@ -122,7 +122,7 @@ private:
     std::uint64_t unreachable_ = 0;
 };
 
-RecordingRedactor::Work::Work(std::istream& recording, MetaDataParser::StreamType type, RecordingRedaction redaction,
+RecordingRedactor::Work::Work(std::istream& recording, Container::Type type, RecordingRedaction redaction,
                               Progress progress)
     : recording_(recording), redaction_(std::move(redaction)), progress_(std::move(progress)),
       parser_(openContainer(recording, type)) {
@@ -183,12 +183,12 @@ void RecordingRedactor::Work::chooseCreator() {
 void RecordingRedactor::Work::prepare() {
     if (check_)
         return;
-    if (container() != MetaDataParser::RawStream)
+    if (container() != Container::RawStream)
         requireWholeContainer();
     collectTexts();
     check_.emplace(redaction_, streamRedaction_, texts_);
     check_->requireNoTextStays(media_);
-    if (container() != MetaDataParser::RawStream)
+    if (container() != Container::RawStream)
         requireNothingMisplaced();
 }
 
@@ -294,7 +294,7 @@ RedactedStream RecordingRedactor::Work::redact(const detail::StreamPart& stream,
 }
 
 std::vector<RedactedStream> RecordingRedactor::Work::writeContents(std::ostream& out) {
-    if (container() == MetaDataParser::RawStream)
+    if (container() == Container::RawStream)
         return writeStreamFile(out);
     writeMedia(out);
     return isMovie() ? writeMovieMetaData(out) : writeRIFFMetaData(out);
@@ -389,8 +389,8 @@ void RecordingRedactor::Work::writeBlank(std::ostream& out, const ContainerItem&
     out.seekp(end);
 }
 
-RecordingRedactor::RecordingRedactor(std::istream& recording, MetaDataParser::StreamType type,
-                                     RecordingRedaction redaction, Progress progress)
+RecordingRedactor::RecordingRedactor(std::istream& recording, Container::Type type, RecordingRedaction redaction,
+                                     Progress progress)
     : work_(std::make_unique<Work>(recording, type, std::move(redaction), std::move(progress))) {}
 
 RecordingRedactor::~RecordingRedactor() = default;

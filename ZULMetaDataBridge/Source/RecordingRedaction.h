@@ -6,7 +6,7 @@
 //     RecordingRedaction redaction;
 //     redaction.streams.clearsKeys = true;
 //     redaction.removesChapters = true;
-//     RecordingRedactor(recording, MetaDataParser::QuickTime, redaction).write("Public.mp4");
+//     RecordingRedactor(recording, Container::QuickTime, redaction).write("Public.mp4");
 
 #include "../../Platform/FileLocation.h"
 #include "../../SharedDependencies/Callback.h"
@@ -103,7 +103,7 @@ public:
     using Progress = Callback<void(Step step, std::uint64_t done, std::uint64_t total)>;
 
     /// `recording` is the caller's and must outlive this. Throws `std::system_error` if it cannot be read.
-    RecordingRedactor(std::istream& recording, MetaDataParser::StreamType type, RecordingRedaction redaction,
+    RecordingRedactor(std::istream& recording, Container::Type type, RecordingRedaction redaction,
                       Progress progress = {});
     ~RecordingRedactor();
     RecordingRedactor(const RecordingRedactor&) = delete;

@@ -1,9 +1,9 @@
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
-#include "ZULMetaData/AtomFormat.h"
-#include "ZULMetaData/ContainerLayout.h"
-#include "ZULMetaData/ContainerRecognition.h"
-#include "ZULMetaData/RecordingInfo.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaData/Containers/RecordingInfo.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
 #include "ZULMetaDataBridge/Source/MovieTransaction.h"
@@ -37,16 +37,16 @@ std::ifstream openMovie(const FileLocation& movie) {
 /// An empty file may yet become a movie; `repair` refuses it in words of its own.
 void requireMovie(std::ifstream& file, const FileLocation& movie) {
     const RecognizedContainer recognized = recognizeContainer(file, utf8Path(movie));
-    if (recognized.type == MetaDataParser::QuickTime || sizeOfInput(file) == 0)
+    if (recognized.type == Container::QuickTime || sizeOfInput(file) == 0)
         return;
-    throw SaveError(utf8Path(movie), recognized.type == MetaDataParser::Unknown ? recognized.refusal()
-                                     : recognized.type == MetaDataParser::Riff
+    throw SaveError(utf8Path(movie), recognized.type == Container::Unknown ? recognized.refusal()
+                                     : recognized.type == Container::Riff
                                          ? "is a RIFF file by its contents, not a movie"
                                          : "is a stream file by its contents, not a movie");
 }
 
 std::unique_ptr<MetaDataParser> parserOver(std::ifstream& movie) {
-    return MetaDataParser::create(movie, MetaDataParser::QuickTime);
+    return MetaDataParser::create(movie, Container::QuickTime);
 }
 
 /// A stream that was found worth attaching.
@@ -263,7 +263,7 @@ FragmentIndexState Save::treat(SafeMovieSave::FragmentIndex index) {
     std::optional<ContainerItem> found;
     {
         std::ifstream movie = openMovie(movie_);
-        visitTopLevel(movie, MetaDataParser::QuickTime, [&](const ContainerItem& item) {
+        visitTopLevel(movie, Container::QuickTime, [&](const ContainerItem& item) {
             if (item.type == "mfra")
                 found = item;
             return true;

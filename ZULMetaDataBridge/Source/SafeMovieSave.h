@@ -10,7 +10,7 @@
 #include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
 #include "../../SharedDependencies/ZCAPHeader.h"
-#include "../../ZULMetaData/RepairPlan.h"
+#include "../../ZULMetaData/Containers/RepairPlan.h"
 #include "../../ZULMetaData/StreamExtent.h"
 #include "StreamSource.h"
 

@@ -1,7 +1,7 @@
 #include "ZULMetaDataBridge/Source/StreamSalvage.h"
 
-#include "ZULMetaData/AtomFormat.h"
-#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
 
@@ -129,7 +129,7 @@ ReadBytes readingBehind(ReadBytes read, std::uint64_t offset) {
 
 } // namespace
 
-StreamSalvage::StreamSalvage(std::istream& file, MetaDataParser::StreamType type, Progress progress)
+StreamSalvage::StreamSalvage(std::istream& file, Container::Type type, Progress progress)
     : read_(readingFrom(file)), file_(file), type_(type), progress_(std::move(progress)) {
     total_ = sizeOfInput(file_);
 }
@@ -156,9 +156,9 @@ void StreamSalvage::findReachable() {
         found.stream.declaredBytes = declared;
         reachable_.push_back(found);
     };
-    if (type_ == MetaDataParser::RawStream)
+    if (type_ == Container::RawStream)
         return add(0, 0, total_);
-    const auto listChildren = type_ == MetaDataParser::QuickTime ? listAtoms : listChunks;
+    const auto listChildren = type_ == Container::QuickTime ? listAtoms : listChunks;
     const auto readable = [this](std::vector<ContainerItem> items) {
         requireReadable(file_);
         return items;

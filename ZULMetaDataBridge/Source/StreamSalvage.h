@@ -4,7 +4,7 @@
 // a file that was cut short, or without any container. All bytes of the file are searched for headers of streams, and
 // what follows a header is measured entry by entry.
 //
-//     StreamSalvage salvage(file, MetaDataParser::QuickTime);
+//     StreamSalvage salvage(file, Container::QuickTime);
 //     for (const SalvagedStream& stream : salvage.run().streams)
 //         std::cout << stream.header.uuid << " at " << stream.offset << ": " << stream.entries << " entries\n";
 
@@ -68,7 +68,7 @@ public:
     /// `file` must outlive this object. If `type` is `Unknown` or `RawStream`, there is no container to walk along; a
     /// stream at the beginning of a bare stream file is reachable. Throws `std::system_error` if the size of the file
     /// cannot be determined.
-    StreamSalvage(std::istream& file, MetaDataParser::StreamType type, Progress progress = {});
+    StreamSalvage(std::istream& file, Container::Type type, Progress progress = {});
 
     /// Searches the whole file with a few megabytes of memory. Throws `std::system_error` if the file cannot be read.
     SalvageReport run();
@@ -95,7 +95,7 @@ private:
 
     ReadBytes read_;
     std::istream& file_;
-    MetaDataParser::StreamType type_;
+    Container::Type type_;
     Progress progress_;
     std::uint64_t total_ = 0;
     std::vector<Candidate> candidates_; ///< in the order of the file

@@ -3,8 +3,8 @@
 #include "Platform/AssertionReport.h"
 #include "Platform/ProcessInfo.h"
 #include "SharedDependencies/EndianFile.h"
-#include "ZULMetaData/AtomFormat.h"
-#include "ZULMetaData/AtomWriting.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomWriting.h"
 #include "ZULMetaDataBridge/Source/ZULMAtomRepair.h"
 
 #include <cstdint>

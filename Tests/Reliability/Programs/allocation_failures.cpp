@@ -7,7 +7,7 @@
 // kept, and files that are what they were or can be gone on with.
 
 #include "Tests/Reliability/Programs/FailingAllocations.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "Tests/ZULMetaDataBridge/EntriesAsText.h"
 #include "Tests/ZULMetaDataBridge/KindSamples.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"

@@ -6,8 +6,8 @@
 
 #include "Tests/Reliability/Programs/Observations.h"
 
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
 #include <functional>
 #include <iostream>

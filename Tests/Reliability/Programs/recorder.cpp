@@ -13,7 +13,7 @@
 
 #include "Tests/Reliability/Programs/Observations.h"
 
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
 #include <array>
 #include <cstdio>

@@ -5,7 +5,7 @@
 //
 // Prints how many streams were read, recorded and appended; ends with 1 where one of them is wrong.
 
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "Tests/ZULMetaDataBridge/EntriesAsText.h"
 #include "Tests/ZULMetaDataBridge/KindSamples.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"

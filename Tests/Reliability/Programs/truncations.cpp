@@ -6,7 +6,7 @@
 
 #include "Tests/Reliability/Programs/Exercise.h"
 #include "Tests/Reliability/Programs/Watch.h"
-#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 
 #include <algorithm>

@@ -49,7 +49,7 @@ protected:
 private:
     void load(MetaDataObserver<typename Kind::Value>& observer) const {
         const auto bytes = getMetaDataStream(Kind::type);
-        const auto stream = MetaDataParser::create(*bytes, MetaDataParser::RawStream);
+        const auto stream = MetaDataParser::create(*bytes, Container::RawStream);
         if (!stream)
             return;
         try {

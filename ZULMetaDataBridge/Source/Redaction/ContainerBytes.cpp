@@ -1,6 +1,6 @@
 #include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaDataBridge/Source/EntryTexts.h"
 #include "ZULMetaDataBridge/Source/Redaction/TextSearch.h"
 

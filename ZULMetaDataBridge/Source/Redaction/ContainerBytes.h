@@ -2,7 +2,7 @@
 
 // Numbers and texts in the parts of a container that are read whole.
 
-#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/StreamExtent.h"
 #include "ZULMetaDataBridge/Source/Redaction/MediaPlaces.h"
 

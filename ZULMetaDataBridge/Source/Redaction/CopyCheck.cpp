@@ -1,7 +1,7 @@
 #include "ZULMetaDataBridge/Source/Redaction/CopyCheck.h"
 
-#include "ZULMetaData/ContainerRecognition.h"
-#include "ZULMetaData/RecordingInfo.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaData/Containers/RecordingInfo.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
 #include "ZULMetaDataBridge/Source/Redaction/NullOutput.h"
 
@@ -58,8 +58,8 @@ std::vector<StreamPart> streamsIn(MetaDataParser& recording) {
 
 MediaPlaces placesIn(MetaDataParser& recording) {
     switch (recording.getStreamType()) {
-    case MetaDataParser::QuickTime: return findPlacesInMovie(recording.getStream());
-    case MetaDataParser::Riff: return findPlacesInRIFF(recording.getStream());
+    case Container::QuickTime: return findPlacesInMovie(recording.getStream());
+    case Container::Riff: return findPlacesInRIFF(recording.getStream());
     default: return {};
     }
 }
@@ -107,14 +107,14 @@ void CopyCheck::requireNoTextStays(const MediaPlaces& media) const {
                          "texts that are to go are in the movie too: " + places);
 }
 
-void CopyCheck::requireClean(std::istream& copy, MetaDataParser::StreamType type,
+void CopyCheck::requireClean(std::istream& copy, Container::Type type,
                              const std::function<void(std::uint64_t)>& advance) const {
     const auto parser = openContainer(copy, type);
     if (!parser)
         throw RedactionError(Reason::CannotWrite, "the copy cannot be read back");
     for (const StreamPart& stream : streamsIn(*parser))
         requireCleanStream(stream);
-    if (type == MetaDataParser::RawStream)
+    if (type == Container::RawStream)
         return;
     if (hasTexts())
         requireCleanTexts(placesIn(*parser));

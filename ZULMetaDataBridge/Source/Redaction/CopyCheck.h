@@ -39,7 +39,7 @@ public:
     void requireNoTextStays(const MediaPlaces& media) const;
 
     /// Throws `RedactionError` if the copy holds anything that was to go.
-    void requireClean(std::istream& copy, MetaDataParser::StreamType type,
+    void requireClean(std::istream& copy, Container::Type type,
                       const std::function<void(std::uint64_t)>& advance) const;
 
 private:

@@ -3,7 +3,7 @@
 // The places of a movie or RIFF file, apart from the recording's metadata, that hold texts or unused bytes: chapters,
 // titles, tags and captions, and space that nobody uses. Sample data is read only where tracks of texts lead to it.
 
-#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 
 #include <cstdint>
 #include <istream>

@@ -36,7 +36,7 @@ public:
     explicit MovieWalk(std::istream& movie) : movie_(movie), read_(readingFrom(movie)), total_(sizeOfInput(movie)) {}
 
     MediaPlaces run() {
-        const std::vector<ContainerItem> items = listTopLevel(movie_, MetaDataParser::QuickTime);
+        const std::vector<ContainerItem> items = listTopLevel(movie_, Container::QuickTime);
         requireReadable(movie_);
         for (const ContainerItem& item : items)
             if (!item.holdsMetaData() && !item.holdsRecordingInfo())

@@ -21,7 +21,7 @@ public:
     explicit RIFFWalk(std::istream& file) : file_(file), read_(readingFrom(file)), total_(sizeOfInput(file)) {}
 
     MediaPlaces run() {
-        for (const ContainerItem& item : inside(listTopLevel(file_, MetaDataParser::Riff), total_)) {
+        for (const ContainerItem& item : inside(listTopLevel(file_, Container::Riff), total_)) {
             if (isOneOf(item.type, s_lists))
                 visit(item, shownType(item), 0);
             else if (!item.holdsMetaData())

@@ -1,7 +1,7 @@
 #include "ZULMetaDataBridge/Source/Validation/ContainerWalk.h"
 
 #include "SharedDependencies/ZCAPHeader.h"
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
 
 #include <utility>
 

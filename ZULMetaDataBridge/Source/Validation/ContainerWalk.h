@@ -2,9 +2,9 @@
 
 // Validates a container around its streams: that every header makes sense and that the items fill the file.
 
-#include "ZULMetaData/WideRIFF.h"
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaData/Containers/WideRIFF.h"
 #include "ZULMetaDataBridge/Source/Validation/FindingLog.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 #include "ZULMetaDataBridge/Source/Validation/StreamWalk.h"
 #include "ZULMetaDataBridge/Source/Validation/UntrustedInput.h"
 

@@ -2,7 +2,7 @@
 
 // Findings as they are made, of which only so many are kept.
 
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
 #include <cstdint>
 #include <set>

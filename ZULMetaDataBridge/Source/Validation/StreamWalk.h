@@ -4,8 +4,8 @@
 
 #include "Platform/Image.h"
 #include "ZULMetaData/CursorImageSchema.h"
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
 #include "ZULMetaDataBridge/Source/Validation/FindingLog.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 #include "ZULMetaDataBridge/Source/Validation/UntrustedInput.h"
 
 #include <cstdint>

@@ -1,6 +1,6 @@
-#include "ZULMetaData/ContainerScan.h"
+#include "ZULMetaData/Containers/ContainerScan.h"
 
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/PositionedInput.h"
 
 #include <array>

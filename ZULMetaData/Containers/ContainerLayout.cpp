@@ -1,8 +1,9 @@
-#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/WideRIFF.h"
 #include "ZULMetaData/PositionedInput.h"
-#include "ZULMetaData/WideRIFF.h"
+#include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <cstring>
 #include <limits>
@@ -140,14 +141,14 @@ void visitTopChunks(std::istream& stream, std::uint64_t total, const ContainerVi
 
 } // namespace
 
-void visitTopLevel(std::istream& stream, MetaDataParser::StreamType type, const ContainerVisitor& visit) {
+void visitTopLevel(std::istream& stream, Container::Type type, const ContainerVisitor& visit) {
     stream.clear();
     const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
     if (stream.fail())
         return;
-    if (type == MetaDataParser::QuickTime)
+    if (type == Container::QuickTime)
         visitAtoms(stream, 0, s_anywhere, total, visit);
-    else if (type == MetaDataParser::Riff)
+    else if (type == Container::Riff)
         visitTopChunks(stream, total, visit);
 }
 
@@ -161,7 +162,7 @@ std::vector<ContainerItem> listChunks(std::istream& stream, std::uint64_t begin,
     return listOf([&](const ContainerVisitor& visit) { visitChunks(stream, begin, end, total, visit); });
 }
 
-std::vector<ContainerItem> listTopLevel(std::istream& stream, MetaDataParser::StreamType type) {
+std::vector<ContainerItem> listTopLevel(std::istream& stream, Container::Type type) {
     return listOf([&](const ContainerVisitor& visit) { visitTopLevel(stream, type, visit); });
 }
 

@@ -1,8 +1,8 @@
-#include "ZULMetaData/ContainerRecognition.h"
-#include "ZULMetaData/ContainerScan.h"
-#include "ZULMetaData/FileParser.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaData/Containers/ContainerScan.h"
+#include "ZULMetaData/Containers/FileParser.h"
+#include "ZULMetaData/Containers/WideRIFF.h"
 #include "ZULMetaData/StreamExtent.h"
-#include "ZULMetaData/WideRIFF.h"
 
 #include <cerrno>
 #include <stdexcept>
@@ -20,7 +20,7 @@ public:
 
     void recognize(const std::string& path) requires std::is_base_of_v<detail::FileParser, Parser> {
         const RecognizedContainer recognized = recognizeContainer(this->getStream(), path);
-        if (recognized.type == MetaDataParser::Unknown)
+        if (recognized.type == Container::Unknown)
             throw std::runtime_error(recognized.refusal());
         this->setStreamType(recognized.type);
     }
@@ -29,7 +29,7 @@ public:
         std::istream& stream = this->getStream();
         const std::uint64_t size = sizeOfInput(stream);
         this->cacheFileStreamInfo();
-        if (this->getStreamType() != MetaDataParser::Riff)
+        if (this->getStreamType() != Container::Riff)
             return requireReadable(stream);
         requireReadable(stream);
         const auto wide = detail::wideRIFF(stream);
@@ -49,7 +49,7 @@ public:
 
 std::unique_ptr<MetaDataParser> openContainer(const std::string& path) {
     errno = 0;
-    auto parser = std::make_unique<ThoroughParser<detail::FileParser>>(path, MetaDataParser::Unknown);
+    auto parser = std::make_unique<ThoroughParser<detail::FileParser>>(path, Container::Unknown);
     if (!parser->isOpen())
         throw std::system_error(errno, std::generic_category(), "cannot be opened");
     parser->recognize(path);
@@ -57,7 +57,7 @@ std::unique_ptr<MetaDataParser> openContainer(const std::string& path) {
     return parser;
 }
 
-std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, MetaDataParser::StreamType type) {
+std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, Container::Type type) {
     auto parser = std::make_unique<ThoroughParser<detail::StreamParser>>(stream, type);
     stream.clear();
     parser->scan();

@@ -3,9 +3,9 @@
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
-#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
+#include "ZULMetaData/Containers/RepairPlan.h"
 #include "ZULMetaData/PositionedInput.h"
-#include "ZULMetaData/RepairPlan.h"
 
 #include <gtest/gtest.h>
 

@@ -1,5 +1,7 @@
-#include "ZULMetaData/AtomFormat.h"
-#include "ZULMetaData/AtomWriting.h"
+#include "ZULMetaData/Containers/MP4MetaData.h"
+
+#include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomWriting.h"
 #include "ZULMetaData/PositionedInput.h"
 #include "ZULMetaData/StreamBufferAccess.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"

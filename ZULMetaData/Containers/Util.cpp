@@ -1,4 +1,6 @@
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/Util.h"
+
+#include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/PositionedInput.h"
 #include "ZULMetaData/StreamBufferAccess.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"

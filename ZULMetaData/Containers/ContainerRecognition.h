@@ -4,11 +4,11 @@
 //
 //     std::ifstream file("Recording.m4v", std::ios::binary);
 //     const RecognizedContainer recognized = recognizeContainer(file, "Recording.m4v");
-//     if (recognized.type == MetaDataParser::Unknown)
+//     if (recognized.type == Container::Unknown)
 //         std::cerr << "Recording.m4v: " << recognized.refusal() << '\n';
 
-#include "../SharedDependencies/Export.h"
-#include "ZULMMetaDataParser.h"
+#include "../../SharedDependencies/Export.h"
+#include "../ZULMMetaDataParser.h"
 
 #include <cstddef>
 #include <cstdint>
@@ -25,15 +25,15 @@ inline constexpr std::size_t s_recognitionBytes = 512;
 /// The container that begins like this; 24 bytes are enough to tell. `RawStream` for an identifier of the registry's
 /// family, known or not, `Riff` for the signatures `RIFF`, `RF64` and `BW64`, `QuickTime` for an atom whose size covers
 /// its header and whose type is printable.
-ZULMETADATA_API MetaDataParser::StreamType streamTypeOfContents(std::string_view firstBytes);
+ZULMETADATA_API Container::Type streamTypeOfContents(std::string_view firstBytes);
 
 /// The extension, with its dot, under which `MetaDataParser::create` takes a file for a container of this type; empty
 /// for `Unknown`.
-ZULMETADATA_API std::string_view extensionFor(MetaDataParser::StreamType type);
+ZULMETADATA_API std::string_view extensionFor(Container::Type type);
 
 /// What a file is.
 struct ZULMETADATA_API RecognizedContainer {
-    MetaDataParser::StreamType type = MetaDataParser::Unknown; ///< `Unknown` for a file that can hold no metadata
+    Container::Type type = Container::Unknown; ///< `Unknown` for a file that can hold no metadata
     std::string_view foreignName; ///< what a file of unknown type is instead, such as "a Matroska file"; may be empty
     bool contradictsName = false; ///< whether the extension tells another container, or one for a file that is none
 
@@ -55,6 +55,6 @@ ZULMETADATA_API RecognizedContainer recognizeContainer(std::istream& file, const
 ZULMETADATA_API std::unique_ptr<MetaDataParser> openContainer(const std::string& path);
 
 /// The same for a stream of the caller, which must outlive the parser. Throws `std::system_error` if reading fails.
-ZULMETADATA_API std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, MetaDataParser::StreamType type);
+ZULMETADATA_API std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, Container::Type type);
 
 } // namespace ZULMetaData

@@ -3,9 +3,9 @@
 // The atoms of a movie or the chunks of a RIFF file as their headers declare them, for tools that show or check a
 // container. Nothing between the headers is read.
 
-#include "../SharedDependencies/Callback.h"
-#include "../SharedDependencies/Export.h"
-#include "ZULMMetaDataParser.h"
+#include "../../SharedDependencies/Callback.h"
+#include "../../SharedDependencies/Export.h"
+#include "ContainerType.h"
 
 #include <cstdint>
 #include <istream>
@@ -68,9 +68,8 @@ ZULMETADATA_API std::vector<ContainerItem> listChunks(std::istream& stream, std:
 /// The items at the top of a container; none where `type` is a bare stream or unknown. A movie may hold hundreds of
 /// thousands: visiting them keeps none.
 ///@{
-ZULMETADATA_API void visitTopLevel(std::istream& stream, MetaDataParser::StreamType type,
-                                   const ContainerVisitor& visit);
-ZULMETADATA_API std::vector<ContainerItem> listTopLevel(std::istream& stream, MetaDataParser::StreamType type);
+ZULMETADATA_API void visitTopLevel(std::istream& stream, Container::Type type, const ContainerVisitor& visit);
+ZULMETADATA_API std::vector<ContainerItem> listTopLevel(std::istream& stream, Container::Type type);
 ///@}
 
 } // namespace ZULMetaData

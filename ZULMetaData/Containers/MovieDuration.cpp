@@ -1,6 +1,6 @@
-#include "ZULMetaData/MovieDuration.h"
+#include "ZULMetaData/Containers/MovieDuration.h"
 
-#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/PositionedInput.h"
 
 #include <algorithm>
@@ -133,7 +133,7 @@ private:
 
     std::optional<ContainerItem> firstAtTop(std::string_view type) {
         std::optional<ContainerItem> found;
-        visitTopLevel(stream_, MetaDataParser::QuickTime, [&](const ContainerItem& item) {
+        visitTopLevel(stream_, Container::QuickTime, [&](const ContainerItem& item) {
             if (item.type == type)
                 found = item;
             return !found;
@@ -369,8 +369,8 @@ std::optional<double> movieDuration(MetaDataParser& movie) {
     return movieDuration(movie.getStream(), movie.getStreamType());
 }
 
-std::optional<double> movieDuration(std::istream& stream, MetaDataParser::StreamType type) {
-    if (type != MetaDataParser::QuickTime)
+std::optional<double> movieDuration(std::istream& stream, Container::Type type) {
+    if (type != Container::QuickTime)
         return std::nullopt;
     return Clock(stream).duration();
 }

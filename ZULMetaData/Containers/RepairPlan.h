@@ -7,7 +7,7 @@
 // cut short or has stray bytes after it, and a movie that `Util::finalizeAtomsInFile` left 8 bytes short. It changes
 // nothing if two readings are possible.
 
-#include "../SharedDependencies/Export.h"
+#include "../../SharedDependencies/Export.h"
 
 #include <cstdint>
 #include <istream>

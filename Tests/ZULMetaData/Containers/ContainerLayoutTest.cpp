@@ -1,6 +1,6 @@
 // The items of containers as their headers declare them.
 
-#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 
 #include "Tests/Support/Bytes.h"
 

@@ -1,9 +1,9 @@
 // Reading the recording info atoms of a movie.
 
-#include "ZULMetaData/RecordingInfo.h"
+#include "ZULMetaData/Containers/RecordingInfo.h"
 
 #include "Tests/Support/Bytes.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 
 #include <gtest/gtest.h>
 

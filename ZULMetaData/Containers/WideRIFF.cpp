@@ -1,7 +1,7 @@
-#include "ZULMetaData/WideRIFF.h"
+#include "ZULMetaData/Containers/WideRIFF.h"
 
-#include "ZULMetaData/AtomFormat.h"
-#include "ZULMetaData/ContainerRecognition.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
 
 #include <algorithm>
 #include <array>
@@ -100,7 +100,7 @@ private:
     bool isOfFamily(std::uint64_t position) {
         std::array<char, s_metaDataHeaderSize> header;
         const std::size_t size = read_(position + s_chunkHeaderSize, header);
-        return streamTypeOfContents({header.data(), size}) == MetaDataParser::RawStream;
+        return streamTypeOfContents({header.data(), size}) == Container::RawStream;
     }
 
     /// Whether chunks follow one another from `position` to the end of the file. The last one may lack its pad byte.

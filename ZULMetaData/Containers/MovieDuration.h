@@ -1,7 +1,7 @@
 #pragma once
 
-#include "../SharedDependencies/Export.h"
-#include "ZULMMetaDataParser.h"
+#include "../../SharedDependencies/Export.h"
+#include "../ZULMMetaDataParser.h"
 
 #include <istream>
 #include <optional>
@@ -17,7 +17,7 @@ namespace ZULMetaData {
 /// lasts as long as its segment indexes (`sidx`) say.
 ///@{
 ZULMETADATA_API std::optional<double> movieDuration(MetaDataParser& movie);
-ZULMETADATA_API std::optional<double> movieDuration(std::istream& stream, MetaDataParser::StreamType type);
+ZULMETADATA_API std::optional<double> movieDuration(std::istream& stream, Container::Type type);
 ///@}
 
 } // namespace ZULMetaData

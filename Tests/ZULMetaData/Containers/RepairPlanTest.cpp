@@ -1,10 +1,10 @@
 // What a repair would change in a movie, byte by byte.
 
-#include "ZULMetaData/RepairPlan.h"
+#include "ZULMetaData/Containers/RepairPlan.h"
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 #include "ZULMetaData/StreamExtent.h"
 
 #include <gmock/gmock.h>

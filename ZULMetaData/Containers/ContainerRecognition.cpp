@@ -1,6 +1,6 @@
-#include "ZULMetaData/ContainerRecognition.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
 
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/StreamExtent.h"
 
 #include <algorithm>
@@ -114,46 +114,45 @@ std::string_view foreignNameOf(std::string_view bytes) {
 }
 
 /// What bytes are that nothing but this library or a movie begins with.
-MetaDataParser::StreamType unmistakableType(std::string_view bytes) {
+Container::Type unmistakableType(std::string_view bytes) {
     if (beginsLikeStream(bytes))
-        return MetaDataParser::RawStream;
+        return Container::RawStream;
     if (beginsLikeRIFF(bytes))
-        return MetaDataParser::Riff;
+        return Container::Riff;
     const FirstAtom atom(bytes);
-    return atom.hasSize() && atom.isKnown() ? MetaDataParser::QuickTime : MetaDataParser::Unknown;
+    return atom.hasSize() && atom.isKnown() ? Container::QuickTime : Container::Unknown;
 }
 
 /// The type of a file whose first bytes say little.
-MetaDataParser::StreamType typeByName(std::string_view bytes, std::uint64_t fileSize,
-                                      MetaDataParser::StreamType named) {
+Container::Type typeByName(std::string_view bytes, std::uint64_t fileSize, Container::Type named) {
     const FirstAtom atom(bytes);
     switch (named) {
-    case MetaDataParser::RawStream: return named;
-    case MetaDataParser::Riff: return atom.isThere ? MetaDataParser::Unknown : named;
-    case MetaDataParser::QuickTime:
-        return !atom.isThere || atom.isPrintable() || atom.fits(fileSize) ? named : MetaDataParser::Unknown;
+    case Container::RawStream: return named;
+    case Container::Riff: return atom.isThere ? Container::Unknown : named;
+    case Container::QuickTime:
+        return !atom.isThere || atom.isPrintable() || atom.fits(fileSize) ? named : Container::Unknown;
     default: break;
     }
     const bool fits = atom.hasSize() && atom.isPrintable() && atom.size <= fileSize;
-    return fits ? MetaDataParser::QuickTime : MetaDataParser::Unknown;
+    return fits ? Container::QuickTime : Container::Unknown;
 }
 
 } // namespace
 
-MetaDataParser::StreamType streamTypeOfContents(std::string_view firstBytes) {
+Container::Type streamTypeOfContents(std::string_view firstBytes) {
     if (beginsLikeStream(firstBytes))
-        return MetaDataParser::RawStream;
+        return Container::RawStream;
     if (beginsLikeRIFF(firstBytes))
-        return MetaDataParser::Riff;
+        return Container::Riff;
     const FirstAtom atom(firstBytes);
-    return atom.hasSize() && atom.isPrintable() ? MetaDataParser::QuickTime : MetaDataParser::Unknown;
+    return atom.hasSize() && atom.isPrintable() ? Container::QuickTime : Container::Unknown;
 }
 
-std::string_view extensionFor(MetaDataParser::StreamType type) {
+std::string_view extensionFor(Container::Type type) {
     switch (type) {
-    case MetaDataParser::Riff: return ".avi";
-    case MetaDataParser::QuickTime: return ".mp4";
-    case MetaDataParser::RawStream: return ".dat";
+    case Container::Riff: return ".avi";
+    case Container::QuickTime: return ".mp4";
+    case Container::RawStream: return ".dat";
     default: return "";
     }
 }
@@ -167,14 +166,14 @@ std::string RecognizedContainer::refusal() const {
 }
 
 RecognizedContainer recognizeContainer(std::string_view firstBytes, std::uint64_t fileSize, const std::string& name) {
-    const MetaDataParser::StreamType named = MetaDataParser::streamTypeOf(name);
+    const Container::Type named = MetaDataParser::streamTypeOf(name);
     RecognizedContainer recognized;
     recognized.type = unmistakableType(firstBytes);
-    if (recognized.type == MetaDataParser::Unknown)
+    if (recognized.type == Container::Unknown)
         recognized.foreignName = foreignNameOf(firstBytes);
-    if (recognized.type == MetaDataParser::Unknown && recognized.foreignName.empty())
+    if (recognized.type == Container::Unknown && recognized.foreignName.empty())
         recognized.type = typeByName(firstBytes, fileSize, named);
-    recognized.contradictsName = named != MetaDataParser::Unknown && named != recognized.type;
+    recognized.contradictsName = named != Container::Unknown && named != recognized.type;
     return recognized;
 }
 

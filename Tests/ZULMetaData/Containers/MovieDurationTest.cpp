@@ -1,6 +1,6 @@
 // The duration that a movie's header declares.
 
-#include "ZULMetaData/MovieDuration.h"
+#include "ZULMetaData/Containers/MovieDuration.h"
 
 #include "Tests/Support/Bytes.h"
 

@@ -1,10 +1,10 @@
-#include "ZULMetaDataBridge/Source/MetaDataValidator.h"
+#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
 #include "SharedDependencies/EndianFile.h"
-#include "ZULMetaData/ContainerRecognition.h"
-#include "ZULMetaData/MovieDuration.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaData/Containers/MovieDuration.h"
+#include "ZULMetaData/Containers/WideRIFF.h"
 #include "ZULMetaData/StreamExtent.h"
-#include "ZULMetaData/WideRIFF.h"
 #include "ZULMetaDataBridge/Source/Validation/ContainerWalk.h"
 #include "ZULMetaDataBridge/Source/Validation/FindingLog.h"
 #include "ZULMetaDataBridge/Source/Validation/UntrustedInput.h"
@@ -41,33 +41,32 @@ ValidationReport validateRecording(const FileLocation& file, const std::set<Find
     if (!stream.is_open())
         throw std::system_error(errno, std::generic_category(), "cannot be opened");
     const RecognizedContainer recognized = recognizeContainer(stream, path);
-    if (recognized.type == MetaDataParser::Unknown)
+    if (recognized.type == Container::Unknown)
         throw std::runtime_error(recognized.refusal());
     return validateRecording(stream, recognized.type, ignored);
 }
 
-ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type) {
+ValidationReport validateRecording(std::istream& stream, Container::Type type) {
     return validateRecording(stream, type, {});
 }
 
-ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type,
-                                   const std::set<FindingCode>& ignored) {
+ValidationReport validateRecording(std::istream& stream, Container::Type type, const std::set<FindingCode>& ignored) {
     ValidationReport report;
     report.container = type;
     report.bytes = sizeOfInput(stream);
     report.duration = movieDuration(stream, type);
     requireReadable(stream);
     std::optional<detail::WideRIFF> wide;
-    if (type == MetaDataParser::Riff)
+    if (type == Container::Riff)
         wide = detail::wideRIFF(stream);
     stream.clear();
     stream.seekg(0);
     detail::UntrustedInput input(stream, report.bytes);
     detail::ContainerWalk walk(input, report, ignored);
     switch (type) {
-    case MetaDataParser::QuickTime: walk.walkMovie(); break;
-    case MetaDataParser::Riff: walk.walkRIFF(wide); break;
-    case MetaDataParser::RawStream: walk.walkRawStream(); break;
+    case Container::QuickTime: walk.walkMovie(); break;
+    case Container::Riff: walk.walkRIFF(wide); break;
+    case Container::RawStream: walk.walkRawStream(); break;
     default: throw std::runtime_error(RecognizedContainer().refusal());
     }
     return report;

@@ -1,12 +1,12 @@
 // RIFF files whose first chunk does not have its size in 32 bits.
 
-#include "ZULMetaData/WideRIFF.h"
+#include "ZULMetaData/Containers/WideRIFF.h"
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
-#include "ZULMetaData/ContainerLayout.h"
-#include "ZULMetaData/ContainerRecognition.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
 
 #include <gtest/gtest.h>
 

@@ -7,9 +7,9 @@
 //     for (const Finding& finding : validateRecording("Recording.mp4").allFindings())
 //         std::cerr << finding.offset << ": " << finding.sentence << '\n';
 
-#include "../../Platform/FileLocation.h"
-#include "../../SharedDependencies/Export.h"
-#include "../../ZULMetaData/ZULMMetaDataParser.h"
+#include "../../../Platform/FileLocation.h"
+#include "../../../SharedDependencies/Export.h"
+#include "../../../ZULMetaData/ZULMMetaDataParser.h"
 
 #include <array>
 #include <cstddef>
@@ -179,15 +179,15 @@ struct ZULMETADATA_API ValidationReport {
     static constexpr std::size_t s_maximumFindings = 1000;
     static constexpr std::size_t s_maximumStreams = 1000; ///< streams in the report; more are walked, but only counted
 
-    MetaDataParser::StreamType container = MetaDataParser::Unknown; ///< as recognized, or as the caller said
-    std::uint64_t bytes = 0;                                        ///< in the file
-    std::optional<double> duration;    ///< of the movie in seconds, as `movieDuration` returns it
-    std::uint64_t streamCount = 0;     ///< `streams.size()`, or more where not all are listed
-    std::uint64_t wholeEntries = 0;    ///< of all streams
-    std::uint64_t damageCount = 0;     ///< findings, listed or not
-    std::uint64_t noticeCount = 0;     ///< findings, listed or not
-    std::vector<StreamReport> streams; ///< in the order of the file
-    std::vector<Finding> findings;     ///< of the container
+    Container::Type container = Container::Unknown; ///< as recognized, or as the caller said
+    std::uint64_t bytes = 0;                        ///< in the file
+    std::optional<double> duration;                 ///< of the movie in seconds, as `movieDuration` returns it
+    std::uint64_t streamCount = 0;                  ///< `streams.size()`, or more where not all are listed
+    std::uint64_t wholeEntries = 0;                 ///< of all streams
+    std::uint64_t damageCount = 0;                  ///< findings, listed or not
+    std::uint64_t noticeCount = 0;                  ///< findings, listed or not
+    std::vector<StreamReport> streams;              ///< in the order of the file
+    std::vector<Finding> findings;                  ///< of the container
 
     bool isDamaged() const { return damageCount > 0; }   ///< notices are no damage
     bool hasMetaData() const { return streamCount > 0; } ///< streams, whole or not
@@ -203,8 +203,8 @@ ZULMETADATA_API ValidationReport validateRecording(const FileLocation& file, con
 
 /// Throws `std::runtime_error` for a stream that cannot be read and for the type `Unknown`.
 ///@{
-ZULMETADATA_API ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type);
-ZULMETADATA_API ValidationReport validateRecording(std::istream& stream, MetaDataParser::StreamType type,
+ZULMETADATA_API ValidationReport validateRecording(std::istream& stream, Container::Type type);
+ZULMETADATA_API ValidationReport validateRecording(std::istream& stream, Container::Type type,
                                                    const std::set<FindingCode>& ignored);
 ///@}
 

@@ -1,7 +1,7 @@
-#include "ZULMetaData/RepairPlan.h"
+#include "ZULMetaData/Containers/RepairPlan.h"
 
 #include "SharedDependencies/ZCAPHeader.h"
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/PositionedInput.h"
 #include "ZULMetaData/StreamExtent.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"

@@ -1,6 +1,6 @@
-#include "ZULMetaData/AtomWriting.h"
+#include "ZULMetaData/Containers/AtomWriting.h"
 
-#include "ZULMetaData/AtomFormat.h"
+#include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/StreamBufferAccess.h"
 
 namespace ZULMetaData::detail {

@@ -1,8 +1,8 @@
 #pragma once
 
-#include "../SharedDependencies/Export.h"
-#include "../SharedDependencies/ZCAPHeader.h"
-#include "ZULMMetaDataParser.h"
+#include "../../SharedDependencies/Export.h"
+#include "../../SharedDependencies/ZCAPHeader.h"
+#include "../ZULMMetaDataParser.h"
 
 #include <vector>
 

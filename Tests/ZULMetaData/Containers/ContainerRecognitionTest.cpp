@@ -1,10 +1,10 @@
 // Containers told apart by their first bytes.
 
-#include "ZULMetaData/ContainerRecognition.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
-#include "Tests/ZULMetaData/ContainerBytes.h"
+#include "Tests/ZULMetaData/Containers/ContainerBytes.h"
 
 #include <gtest/gtest.h>
 

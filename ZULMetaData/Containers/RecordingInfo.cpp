@@ -1,6 +1,6 @@
-#include "ZULMetaData/RecordingInfo.h"
+#include "ZULMetaData/Containers/RecordingInfo.h"
 
-#include "ZULMetaData/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 
 namespace ZULMetaData {
 

@@ -1,0 +1,17 @@
+#pragma once
+
+#include <cstdint>
+
+namespace ZULMetaData {
+
+/// What a file is, as far as finding streams in it is concerned.
+struct Container {
+    enum Type : std::int32_t {
+        Unknown,   ///< a file that can hold no streams
+        Riff,      ///< chunks, as in AVI and WAV files
+        QuickTime, ///< the atoms of a movie
+        RawStream, ///< a stream file without a container
+    };
+};
+
+} // namespace ZULMetaData
