@@ -6,7 +6,7 @@
 #include "../../Platform/FileLocation.h"
 #include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
-#include "../../ZULMetaData/StreamExtent.h"
+#include "../../ZULMetaData/ByteSource.h"
 
 #include <cstdint>
 #include <string>
@@ -32,18 +32,14 @@ public:
 
     const std::string& name() const { return name_; } ///< the path of its file, or what `memory` was given
 
-    /// The stream's bytes, ready to be read. Throws `std::system_error` where its file cannot be opened.
-    struct Bytes {
-        std::uint64_t length = 0; ///< of the stream, header included
-        ReadBytes read;           ///< counts from the header on; keeps its file open
-    };
-    Bytes open() const { return open_(); } ///< independent of those that were opened before
+    /// Returns the bytes of the stream, header included. Throws `std::system_error` if its file cannot be opened.
+    ByteSource open() const { return open_(); }
 
 private:
-    StreamSource(std::string name, Callback<Bytes()> open) : name_(std::move(name)), open_(std::move(open)) {}
+    StreamSource(std::string name, Callback<ByteSource()> open) : name_(std::move(name)), open_(std::move(open)) {}
 
     std::string name_;
-    Callback<Bytes()> open_;
+    Callback<ByteSource()> open_;
 };
 
 } // namespace ZULMetaData
