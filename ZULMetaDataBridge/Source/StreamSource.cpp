@@ -5,6 +5,9 @@
 
 namespace ZULMetaData {
 
+StreamSource::StreamSource(std::string name, Callback<ByteSource()> open)
+    : name_(std::move(name)), open_(std::move(open)), opened_(std::make_shared<std::optional<ByteSource>>()) {}
+
 StreamSource StreamSource::file(const FileLocation& file) {
     return part(file, 0, std::numeric_limits<std::uint64_t>::max());
 }
@@ -13,8 +16,24 @@ StreamSource StreamSource::part(const FileLocation& file, std::uint64_t offset, 
     return {utf8Path(file), [=] { return ByteSource::file(utf8Path(file)).part(offset, length); }};
 }
 
+StreamSource StreamSource::bytes(ByteSource bytes, std::string name) {
+    return {std::move(name), [bytes = std::move(bytes)] { return bytes; }};
+}
+
 StreamSource StreamSource::memory(std::string_view bytes, std::string name) {
-    return {std::move(name), [bytes] { return ByteSource::memory(bytes); }};
+    return StreamSource::bytes(ByteSource::memory(bytes), std::move(name));
+}
+
+StreamSource StreamSource::unchecked() const {
+    StreamSource source = *this;
+    source.isChecked_ = false;
+    return source;
+}
+
+ByteSource StreamSource::open() const {
+    if (!*opened_)
+        *opened_ = open_();
+    return **opened_;
 }
 
 } // namespace ZULMetaData
