@@ -2,6 +2,7 @@
 
 // An input stream whose position is counted instead of asked for, bounded by the size of its file.
 
+#include "SharedDependencies/EndianFile.h"
 #include "SharedDependencies/Export.h"
 #include "ZULMetaData/StreamBufferAccess.h"
 
