@@ -3,7 +3,7 @@
 import type { Entries, StreamSummary } from '#decoder';
 import { cursorAppearances, type Appearance } from './appearances';
 import { clicksOf, type Click } from './clicks';
-import { hasArea, type Rect } from './geometry';
+import { hasArea, type Point, type Rect } from './geometry';
 import { idleStretches, type Stretch } from './idle';
 import { captionsOf, type Caption } from './keys';
 import { markersOf } from './markers';
@@ -107,6 +107,20 @@ export class Session {
 
   allTracks(): Track[] {
     return [...this.tracks.values()];
+  }
+
+  cursorAt(time: number): Point | undefined {
+    const track = this.track('cursorLocation');
+    const index = track?.at(time) ?? -1;
+    return track && index >= 0 ? { x: track.number('x', index), y: track.number('y', index) } : undefined;
+  }
+
+  /// Of the cursor, from 0 to 1.
+  opacityAt(time: number): number {
+    const track = this.track('cursorOpacity');
+    const index = track?.at(time) ?? -1;
+    const opacity = index >= 0 ? track!.number('opacity', index) : 1;
+    return Number.isFinite(opacity) ? Math.max(0, Math.min(1, opacity)) : 1;
   }
 
   captions(showsKeys: boolean): { captions: Caption[]; starts: Float64Array } {
