@@ -3,7 +3,7 @@
 import { clickLabel, type Click } from '../model/clicks';
 import { StreamRows } from '../entries/rows';
 import { brief, titleOf } from '../model/format';
-import { keyLabel } from '../model/keys';
+import { keyCap } from '../model/keys';
 import { countBefore, countUntil, lastAt } from '../model/search';
 import { rectAt, type HiddenStream, type Session } from '../model/session';
 import type { Track } from '../model/track';
@@ -186,26 +186,27 @@ function drawClick(canvas: LaneCanvas, click: Click): void {
 const roomForKeys = 12; // pixels to a key, from which on each shows what it is
 
 function keyLane(session: Session, { showsKeys }: LaneOptions): Lane | undefined {
-  const track = filled(session, 'keyboardAction');
-  return (
-    track && {
-      title: 'Keys',
-      height: 23,
-      draw: (canvas) => {
-        const first = countBefore(track.times, canvas.range.from);
-        const end = countBefore(track.times, canvas.range.to);
-        if (end - first <= canvas.width / roomForKeys) drawKeys(canvas, track, first, end, showsKeys());
-        else drawDensity(canvas, track.times, canvas.palette.accent);
-      },
-      valueAt: (time) => {
-        const index = track.at(time);
-        return index >= 0 && time - track.times[index]! < 1 ? keyLabel(track, index, showsKeys()).text : '';
-      },
-    }
-  );
+  const keys = () => session.keys(showsKeys())!;
+  if (!session.keys(false)?.count) return undefined;
+  return {
+    title: 'Keys',
+    height: 23,
+    draw: (canvas) => {
+      const track = keys();
+      const first = countBefore(track.times, canvas.range.from);
+      const end = countBefore(track.times, canvas.range.to);
+      if (end - first <= canvas.width / roomForKeys) drawKeys(canvas, track, first, end);
+      else drawDensity(canvas, track.times, canvas.palette.accent);
+    },
+    valueAt: (time) => {
+      const track = keys();
+      const index = track.at(time);
+      return index >= 0 && time - track.times[index]! < 1 ? track.text('label', index) : '';
+    },
+  };
 }
 
-function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number, showsKeys: boolean): void {
+function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number): void {
   const {
     context,
     palette: { accent, accentSoft, text },
@@ -215,10 +216,7 @@ function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number, 
   for (let i = first; i < end; ++i) {
     const x = canvas.x(track.times[i]!);
     const room = (i + 1 < end ? canvas.x(track.times[i + 1]!) : Infinity) - x;
-    const label =
-      keyLabel(track, i, showsKeys)
-        .text.replace(/\[(.*)\]$/, '$1')
-        .trim() || '␣';
+    const label = keyCap(track.text('label', i)).trim() || '␣';
     const width = Math.max(9, context.measureText(label).width + 6);
     context.fillStyle = accent;
     context.fillRect(x - 0.75, canvas.top + 4, 1.5, canvas.height - 8);

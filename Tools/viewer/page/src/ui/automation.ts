@@ -1,6 +1,7 @@
 // For scripts that drive the page: where it is, what it shows, and what was decoded.
 
 import { screenToVideo } from '../model/geometry';
+import { captionText } from '../model/keys';
 import type { Page } from './page';
 
 export interface ViewerState {
@@ -38,7 +39,7 @@ function stateOf({ session, player, stage, finished }: Page): ViewerState {
     frame: stage.placement.frame,
     hotSpot: position ? screenToVideo(position, stage.placement) : null,
     opacity: session?.opacityAt(player.time) ?? 1,
-    caption: stage.captionAt(player.time)?.text ?? '',
+    caption: captionText(stage.captionAt(player.time)),
   };
 }
 
