@@ -20,19 +20,14 @@ constexpr std::size_t s_lineLength = 42;
 
 constexpr auto s_mask = "\xe2\x80\xa2"; // bullet
 
-struct ModifierSign {
-    std::string_view name; ///< in the text of `KeyboardModifiersToString`
-    std::string_view sign;
-};
+/// The library's names of the modifiers and their signs, in the order in which they are written before a key.
+constexpr std::array<std::pair<std::string_view, std::string_view>, 5> s_modifierSigns{{{"<Ctrl>", "\xe2\x8c\x83"},
+                                                                                        {"<Alt>", "\xe2\x8c\xa5"},
+                                                                                        {"<Win>", "\xe2\x8a\x9e"},
+                                                                                        {"<Shift>", "\xe2\x87\xa7"},
+                                                                                        {"<Cmd>", "\xe2\x8c\x98"}}};
 
-/// In the order in which they are written before a key.
-constexpr std::array<ModifierSign, 5> s_modifierSigns{{{"<Ctrl>", "\xe2\x8c\x83"},
-                                                       {"<Alt>", "\xe2\x8c\xa5"},
-                                                       {"<Win>", "\xe2\x8a\x9e"},
-                                                       {"<Shift>", "\xe2\x87\xa7"},
-                                                       {"<Cmd>", "\xe2\x8c\x98"}}};
-
-/// The modifiers of a key, by the library's names for them.
+/// The modifiers of a key.
 class Modifiers {
 public:
     explicit Modifiers(std::uint32_t flags)
@@ -44,9 +39,9 @@ public:
 
     std::string signs() const {
         std::string text;
-        for (const ModifierSign& modifier : s_modifierSigns)
-            if (has(modifier.name))
-                text += modifier.sign;
+        for (const auto& [name, sign] : s_modifierSigns)
+            if (has(name))
+                text += sign;
         return text;
     }
 

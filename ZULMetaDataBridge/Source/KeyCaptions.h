@@ -34,7 +34,7 @@ struct KeyCaption {
     std::vector<CaptionKey> keys; ///< at least one, in the order of their times
 };
 
-inline constexpr double s_captionPause = 1; ///< seconds
+inline constexpr double s_captionPause = 1; ///< the usual pause that ends a caption, in seconds
 
 /// Joins keys that follow one another in less than `pause` seconds, up to the end of a line. Orders the keys by their
 /// times, and leaves out those whose time is not finite. If `showsKeys` is false, every key that types a character

@@ -10,7 +10,7 @@ export interface CaptionPart {
   isTyped: boolean;
 }
 
-/// What is on the screen at `time`: the keys of a caption appear as they are pressed.
+/// Returns what is on the screen at `time`: the keys of a caption appear as they are pressed.
 export function captionAt(keys: Track | undefined, time: number): CaptionPart[] {
   const parts: CaptionPart[] = [];
   const index = keys?.at(time) ?? -1;
@@ -28,7 +28,7 @@ export function captionText(parts: CaptionPart[]): string {
   return parts.map(({ text }) => text).join(' ');
 }
 
-/// The label without the brackets around the name of a key.
+/// Returns the label without the brackets around the name of a key.
 export function keyCap(label: string): string {
   return label.replace(/\[(.*)\]$/, '$1');
 }

@@ -119,7 +119,7 @@ export class Session {
     return track && index >= 0 ? { x: track.number('x', index), y: track.number('y', index) } : undefined;
   }
 
-  /// Of the cursor, from 0 to 1.
+  /// The opacity of the cursor, from 0 to 1.
   opacityAt(time: number): number {
     const track = this.track('cursorOpacity');
     const index = track?.at(time) ?? -1;
@@ -127,7 +127,7 @@ export class Session {
     return Number.isFinite(opacity) ? Math.max(0, Math.min(1, opacity)) : 1;
   }
 
-  /// The keys as captions show them.
+  /// The keys as captions show them, or undefined if the recording has none.
   keys(showsKeys: boolean): Track | undefined {
     return showsKeys ? this.clearKeys : this.maskedKeys;
   }

@@ -10,7 +10,7 @@ export interface Page {
   readonly stage: Stage;
   readonly decoder: Decoder;
   readonly session: Session | undefined;
-  /// How many files were opened or refused.
+  /// The number of files that were opened or refused.
   readonly finished: number;
   seek(time: number): void;
   step(seconds: number): void;
