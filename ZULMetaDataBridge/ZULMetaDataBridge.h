@@ -12,6 +12,7 @@
 #include "Source/EntryDictionary.h"
 #include "Source/EntryTexts.h"
 #include "Source/HumanReadableActions.h"
+#include "Source/KeyCaptions.h"
 #include "Source/KeyNames.h"
 #include "Source/KindEntries.h"
 #include "Source/MetaDataExcerpt.h"

@@ -82,9 +82,13 @@ class TopmostWindowTitleMetaDataParser;
 
 struct AttachResult;
 struct AttachedStream;
+struct CaptionKey;
 struct Finding;
 struct FindingRule;
 struct HumanReadableActions;
+struct KeyCaption;
+struct KeyEvent;
+struct KeyName;
 struct RedactedEntry;
 struct RedactedStream;
 struct RedactedTexts;

@@ -185,17 +185,50 @@ const Zulm::StreamInfo& infoNamed(const ZulmRecording& opened, const std::string
     throw Zulm::Failure(fmt::format("{}: holds no stream {}", opened.recording.name(), kind));
 }
 
-std::unique_ptr<ZulmEntries> readEntries(ZulmRecording& opened, const Zulm::StreamInfo& info) {
-    auto entries = std::make_unique<ZulmEntries>();
+void requireDecodable(const ZulmRecording& opened, const Zulm::StreamInfo& info) {
     if (!info.isDecodable)
         throw Zulm::Failure(fmt::format("{}: entries of {}, version {}, cannot be decoded", opened.recording.name(),
                                         ZULMetaData::metaDataKindName(info.type), info.version));
+}
+
+void addViews(ZulmEntries& entries) {
+    for (const EntryColumn& column : entries.columns)
+        entries.views.push_back(column.view());
+}
+
+std::unique_ptr<ZulmEntries> readEntries(ZulmRecording& opened, const Zulm::StreamInfo& info) {
+    requireDecodable(opened, info);
+    auto entries = std::make_unique<ZulmEntries>();
     RecordedKinds::visit(info.type, [&]<class Kind>() {
         EntryCollector<Kind> collector(*entries);
         opened.recording.readEntries<typename Kind::Value>(info, collector);
     });
-    for (const EntryColumn& column : entries->columns)
-        entries->views.push_back(column.view());
+    addViews(*entries);
+    return entries;
+}
+
+/// One row for each key.
+std::unique_ptr<ZulmEntries> readKeyCaptions(ZulmRecording& opened, bool showsKeys) {
+    const Zulm::StreamInfo& info = infoNamed(opened, metaDataKindName(KeyboardActionKind::type));
+    requireDecodable(opened, info);
+    MetaDataObserver<KeyStroke> read;
+    opened.recording.readEntries<KeyStroke>(info, read);
+    std::vector<KeyEvent> keys;
+    for (std::size_t i = 0; i < read.values.size(); ++i)
+        keys.push_back({read.times[i], read.values[i]});
+    auto entries = std::make_unique<ZulmEntries>();
+    entries->columns = {{"label", ZulmTexts}, {"isTyped", ZulmInt32}, {"first", ZulmInt32}, {"end", ZulmReal}};
+    for (const KeyCaption& caption : keyCaptions(std::move(keys), showsKeys)) {
+        const auto first = static_cast<std::int32_t>(entries->times.size());
+        for (const CaptionKey& key : caption.keys) {
+            entries->times.push_back(key.time);
+            entries->columns[0].add(key.label);
+            entries->columns[1].add(std::int32_t{key.isTyped});
+            entries->columns[2].add(first);
+            entries->columns[3].add(caption.end);
+        }
+    }
+    addViews(*entries);
     return entries;
 }
 
@@ -262,6 +295,10 @@ ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind) {
 
 ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index) {
     return orNull([&] { return readEntries(*recording, recording->hidden.infos[index]).release(); });
+}
+
+ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys) {
+    return orNull([&] { return readKeyCaptions(*recording, showsKeys != 0).release(); });
 }
 
 void zulm_free_entries(ZulmEntries* entries) {
