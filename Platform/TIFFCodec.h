@@ -1,7 +1,7 @@
 #pragma once
 
-// TIFF files to pixels and back. All functions throw `std::bad_alloc` if there is no memory, except that libtiff does not
-// say whether a file that it cannot read is damaged or needs more memory.
+// TIFF files to pixels and back. All functions throw `std::bad_alloc` if there is no memory, except that libtiff does
+// not say whether a file that it cannot read is damaged or needs more memory.
 
 #include "Platform/Image.h"
 

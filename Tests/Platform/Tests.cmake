@@ -15,6 +15,11 @@ zulm_add_tests(PlatformTests
 target_sources(PlatformTests PRIVATE Platform/ImageTestSupport.cpp)
 target_link_libraries(PlatformTests PRIVATE TIFF::TIFF)
 
+# These limit the memory that is to be had.
+zulm_add_tests(PlatformMemoryTests
+  ImageMemoryTest)
+target_link_libraries(PlatformMemoryTests PRIVATE ZULMetaDataMemoryWatch)
+
 # What takes the place of the codecs in a build without them.
 zulm_add_tests(PlatformWithoutCodecsTests
   ImageWithoutCodecsTest)
