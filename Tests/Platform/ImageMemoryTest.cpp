@@ -17,7 +17,7 @@ TEST(ImageWithoutMemory, ThrowsWhateverItIsNeededFor) {
     const Image image(2, 1, {255, 0, 0, 255, 0, 255, 0, 128});
     const auto bitmap = BitmapImageRep::fromTIFF(image.tiffRepresentation());
     const auto png = bitmap->pngRepresentation();
-    for (const std::size_t largest : {64, 512, 2048}) { // too little for libpng's structures or for zlib's
+    for (const std::size_t largest : {64U, 512U, 2048U}) { // too little for libpng's structures or for zlib's
         MemoryWatch memory;
         memory.refuseAbove(largest);
         EXPECT_THROW(Image::fromEncodedBytes(png), std::bad_alloc);
