@@ -296,7 +296,7 @@ std::optional<EncodedImageInfo> readPNGInfo(Bytes encoded) {
     PNGReader reader(encoded);
     if (!reader.readHeader(PNGReader::Pixels::RGBA))
         return std::nullopt;
-    constexpr std::uint64_t rowBuffers = 8; // a few rows of up to 16 bits a channel
+    constexpr std::uint32_t rowBuffers = 8; // a few rows of up to 16 bits a channel
     constexpr std::uint64_t tables = std::uint64_t{128} << 10;
     return EncodedImageInfo{reader.width(), reader.height(),
                             rgbaSize(reader.width(), reader.height() + rowBuffers) + tables};
