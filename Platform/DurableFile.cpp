@@ -49,7 +49,7 @@ int syncOnce(int descriptor) {
 
 } // namespace
 
-// Without O_NONBLOCK, opening a pipe would wait for its other end.
+/// Without O_NONBLOCK, opening a pipe would wait for its other end.
 DurableFile::DurableFile(const FileLocation& file)
     : descriptor_(uninterrupted([&] { return open(file.c_str(), O_RDWR | O_CLOEXEC | O_NONBLOCK | O_NOCTTY); })) {
     if (descriptor_ < 0)
@@ -69,21 +69,6 @@ DurableFile::~DurableFile() {
 
 std::uint64_t DurableFile::size() const {
     return static_cast<std::uint64_t>(statusOf(descriptor_).st_size);
-}
-
-std::size_t DurableFile::readAt(std::uint64_t position, std::span<char> bytes) const {
-    std::size_t done = 0;
-    while (done < bytes.size()) {
-        const auto offset = static_cast<off_t>(position + done);
-        const ssize_t got =
-            uninterrupted([&] { return pread(descriptor_, bytes.data() + done, bytes.size() - done, offset); });
-        if (got < 0)
-            fail(errno, "cannot be read" + atOffset(position + done));
-        if (got == 0)
-            break;
-        done += static_cast<std::size_t>(got);
-    }
-    return done;
 }
 
 void DurableFile::writeAt(std::uint64_t position, std::span<const char> bytes) {

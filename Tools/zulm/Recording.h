@@ -11,12 +11,10 @@
 #include <fmt/core.h>
 #include <nlohmann/json.hpp>
 
-#include <cerrno>
 #include <concepts>
 #include <cstdint>
 #include <istream>
 #include <memory>
-#include <new>
 #include <optional>
 #include <string>
 #include <system_error>
@@ -49,23 +47,6 @@ auto orUnreadable(const std::string& name, Work work) {
         throw Failure(fmt::format("{}: cannot be read: {}", name, error.code().message()));
     }
 }
-
-/// Hands cursor images on. A reader leaves an image out that it gets no memory for; this throws `std::bad_alloc`.
-class WithTheirImages final : public ZULMetaData::DataStreamObserver<ZULMetaData::CursorImage> {
-public:
-    explicit WithTheirImages(DataStreamObserver& observer) : observer_(observer) { errno = 0; }
-
-    bool dataRead(double time, const ZULMetaData::CursorImage& image) override {
-        if (!image.imageData && errno == ENOMEM)
-            throw std::bad_alloc();
-        const bool goesOn = observer_.dataRead(time, image);
-        errno = 0;
-        return goesOn;
-    }
-
-private:
-    DataStreamObserver& observer_;
-};
 
 class Recording {
 public:
@@ -100,18 +81,22 @@ public:
     /// they lie behind damage.
     std::vector<StreamInfo> hiddenStreams();
 
-    /// Delivers the entries of a decodable stream as far as they are whole.
+    /// Delivers the entries of a decodable stream as far as they are whole. Throws `std::bad_alloc` if there is no
+    /// memory for an image, which `parseStream` would leave out.
     template <class Value>
     void readEntries(const StreamInfo& stream, ZULMetaData::DataStreamObserver<Value>& observer) {
-        const auto readTo = [&](ZULMetaData::DataStreamObserver<Value>& to) {
-            ZULMetaData::MetaDataReader<Value>::parseStream(to, parser_->getStream(), stream.range.offset,
-                                                            stream.readableBytes, -1);
-        };
         if constexpr (std::same_as<Value, ZULMetaData::CursorImage>) {
-            WithTheirImages whole(observer);
-            readTo(whole);
+            const auto read = [file = bytes(), start = stream.range.offset](std::uint64_t position, auto into) {
+                return file(start + position, into);
+            };
+            ZULMetaData::StreamEntries entries(read, stream.readableBytes);
+            while (const auto entry = entries.next())
+                if (const auto decoded = ZULMetaData::decodeEntry<Value>(entries.bytesOf(*entry), stream.version))
+                    if (!observer.dataRead(decoded->time, decoded->value))
+                        break;
         } else {
-            readTo(observer);
+            ZULMetaData::MetaDataReader<Value>::parseStream(observer, parser_->getStream(), stream.range.offset,
+                                                            stream.readableBytes, -1);
         }
         requireRead(parser_->getStream(), name_);
     }
