@@ -71,6 +71,21 @@ std::uint64_t DurableFile::size() const {
     return static_cast<std::uint64_t>(statusOf(descriptor_).st_size);
 }
 
+std::size_t DurableFile::readAt(std::uint64_t position, std::span<char> bytes) const {
+    std::size_t done = 0;
+    while (done < bytes.size()) {
+        const auto offset = static_cast<off_t>(position + done);
+        const ssize_t got =
+            uninterrupted([&] { return pread(descriptor_, bytes.data() + done, bytes.size() - done, offset); });
+        if (got < 0)
+            fail(errno, "cannot be read" + atOffset(position + done));
+        if (got == 0)
+            break;
+        done += static_cast<std::size_t>(got);
+    }
+    return done;
+}
+
 void DurableFile::writeAt(std::uint64_t position, std::span<const char> bytes) {
     std::size_t done = 0;
     while (done < bytes.size()) {

@@ -14,13 +14,17 @@ namespace ZULMetaData {
 /// Keeps others who open the file this way out as long as it lives; readers are not disturbed.
 class DurableFile {
 public:
-    /// Opens a file that exists. Throws for anything but a regular file, and if another one holds it open this way.
+    /// Opens a file that exists, for reading and writing. Throws for anything but a regular file, and where another
+    /// one holds it open this way.
     explicit DurableFile(const FileLocation& file);
     ~DurableFile();
     DurableFile(const DurableFile&) = delete;
     DurableFile& operator=(const DurableFile&) = delete;
 
     std::uint64_t size() const;
+
+    /// Reads bytes and returns their number, which is smaller than asked for only at the end of the file.
+    std::size_t readAt(std::uint64_t position, std::span<char> bytes) const;
 
     /// Writes all of `bytes`, or throws with some of them written.
     void writeAt(std::uint64_t position, std::span<const char> bytes);
