@@ -71,6 +71,12 @@ std::uint64_t DurableFile::size() const {
     return static_cast<std::uint64_t>(statusOf(descriptor_).st_size);
 }
 
+bool DurableFile::isNamed(const FileLocation& file) const {
+    struct stat named {};
+    const struct stat own = statusOf(descriptor_);
+    return stat(file.c_str(), &named) == 0 && named.st_dev == own.st_dev && named.st_ino == own.st_ino;
+}
+
 std::size_t DurableFile::readAt(std::uint64_t position, std::span<char> bytes) const {
     std::size_t done = 0;
     while (done < bytes.size()) {
