@@ -1,0 +1,179 @@
+#include "ZULMetaDataBridge/Source/RecordingCompaction.h"
+
+#include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/RepairPlan.h"
+#include "ZULMetaDataBridge/Source/MetaDataSection.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <filesystem>
+#include <fstream>
+#include <set>
+#include <span>
+#include <system_error>
+
+namespace ZULMetaData {
+
+namespace {
+
+using Reason = CompactionError::Reason;
+
+/// Larger items are not compared with one another.
+constexpr std::uint64_t s_mostCompared = 1 << 20;
+
+bool isBlank(const ContainerItem& item) {
+    return item.type == detail::s_freeAtom || item.type == "skip" || item.type == detail::s_junkChunk;
+}
+
+bool isIndex(const ContainerItem& item) {
+    return item.type == detail::s_fragmentIndexAtom;
+}
+
+bool isOwn(const ContainerItem& item) {
+    return item.holdsMetaData() || item.holdsRecordingInfo();
+}
+
+/// Returns whether the media does not need to know the place of the item.
+bool isMovable(const ContainerItem& item) {
+    return isOwn(item) || isBlank(item) || isIndex(item);
+}
+
+std::string allOf(const ByteSource& source) {
+    std::string bytes(static_cast<std::size_t>(source.size()), '\0');
+    bytes.resize(source.read(0, bytes));
+    return bytes;
+}
+
+[[noreturn]] void failToWrite() {
+    throw CompactionError(Reason::CannotWrite,
+                          "cannot be written: " + std::error_code(errno, std::generic_category()).message());
+}
+
+} // namespace
+
+RecordingCompaction::RecordingCompaction(Recording& recording, KeptMetaData kept)
+    : recording_(recording), kept_(kept), items_(topLevelItems(recording.bytes(), recording.container())) {
+    if (recording_.container() == Container::RawStream)
+        throw CompactionError(Reason::NoContainer, "is a stream alone, without a movie around it");
+    requireWholeContainer();
+    findTail();
+    chooseCreators();
+    if (kept_ == KeptMetaData::Newest) {
+        requireReachableStreams();
+        streams_ = recording_.streams();
+    }
+    streamsLeftOut_ = recording_.validation().streamCount - streams_.size();
+}
+
+std::uint64_t RecordingCompaction::copiedBytes() const {
+    return tail_ < items_.size() ? items_[tail_].offset : recording_.size();
+}
+
+void RecordingCompaction::requireWholeContainer() const {
+    const RepairPlan plan = isMovie() ? planRepair(recording_.bytes()) : RepairPlan();
+    if (plan.state == RepairPlan::Repairable)
+        throw CompactionError(Reason::Repairable, plan.finding);
+    const std::uint64_t end = items_.empty() ? 0 : items_.back().end();
+    const bool fillsFile = end == recording_.size() || (!isMovie() && end + end % 2 == recording_.size());
+    if (plan.state == RepairPlan::Unrepairable || !fillsFile)
+        throw CompactionError(Reason::Damaged, plan.finding.empty() ? "its parts do not fill the file" : plan.finding);
+}
+
+void RecordingCompaction::requireReachableStreams() {
+    const auto& streams = recording_.validation().streams;
+    if (std::any_of(streams.begin(), streams.end(), [](const StreamReport& stream) { return !stream.isReachable; }))
+        throw CompactionError(Reason::UnreachableStream,
+                              "no reader finds some of its streams, and the copy would lose them");
+}
+
+/// The tail begins with the first metadata that nothing but metadata, blanks and an index of fragments follows. A blank
+/// before it is part of it if it is what was left of the index when that was moved to the end.
+void RecordingCompaction::findTail() {
+    tail_ = items_.size();
+    for (std::size_t i = items_.size(); i > 0 && isMovable(items_[i - 1]); --i)
+        if (isOwn(items_[i - 1]))
+            tail_ = i - 1;
+    if (tail_ > 0 && tail_ < items_.size() && isBlank(items_[tail_ - 1]) && isCopyOfIndex(items_[tail_ - 1]))
+        --tail_;
+}
+
+bool RecordingCompaction::isCopyOfIndex(const ContainerItem& blank) const {
+    const ContainerItem& index = items_.back();
+    if (!isIndex(index) || index.size != blank.size || blank.size > s_mostCompared)
+        return false;
+    return allOf(bytesOf(blank).part(detail::s_atomHeaderSize)) == allOf(bytesOf(index).part(detail::s_atomHeaderSize));
+}
+
+/// The last one stays of recording info that says the same.
+void RecordingCompaction::chooseCreators() {
+    std::set<std::string> seen;
+    std::vector<ContainerItem> indexes;
+    for (std::size_t i = items_.size(); i > tail_; --i) {
+        const ContainerItem& item = items_[i - 1];
+        if (isIndex(item) && indexes.empty())
+            indexes.push_back(item);
+        if (!item.holdsRecordingInfo())
+            continue;
+        const bool isNew = item.size > s_mostCompared || seen.insert(allOf(bytesOf(item))).second;
+        if (kept_ == KeptMetaData::Newest && isNew)
+            appended_.insert(appended_.begin(), item);
+        else
+            ++creatorsLeftOut_;
+    }
+    appended_.insert(appended_.end(), indexes.begin(), indexes.end());
+}
+
+void RecordingCompaction::complete(const FileLocation& copy) {
+    std::fstream out;
+    fileOpen(out, utf8Path(copy).c_str(), std::ios::in | std::ios::out | std::ios::binary);
+    if (!out.is_open())
+        failToWrite();
+    blankEarlierMetaData(out);
+    out.seekp(static_cast<std::streamoff>(copiedBytes()));
+    writeStreams(out);
+    for (const ContainerItem& item : appended_)
+        appendBytes(bytesOf(item), out);
+    const auto end = out.tellp();
+    out.close();
+    if (!out || end < 0)
+        failToWrite();
+    sizeAfter_ = static_cast<std::uint64_t>(end);
+    std::error_code error;
+    std::filesystem::resize_file(copy, sizeAfter_, error); // what was skipped at the end is zero
+    if (error)
+        throw CompactionError(Reason::CannotWrite, "cannot be written: " + error.message());
+}
+
+/// Metadata before the media leaves its place empty: the media may know the offsets of what follows.
+void RecordingCompaction::blankEarlierMetaData(std::ostream& out) const {
+    const std::string zeros(s_mostCompared, '\0');
+    for (const ContainerItem& item : std::span(items_).first(tail_)) {
+        if (!isOwn(item) || (item.holdsRecordingInfo() && kept_ == KeptMetaData::Newest))
+            continue;
+        out.seekp(static_cast<std::streamoff>(item.offset + (isMovie() ? sizeof item.sizeField : 0)));
+        out << (isMovie() ? detail::s_freeAtom : detail::s_junkChunk).text();
+        out.seekp(static_cast<std::streamoff>(item.payloadOffset()));
+        for (std::uint64_t left = item.payloadSize(); left > 0; left -= std::min<std::uint64_t>(left, zeros.size()))
+            out.write(zeros.data(), static_cast<std::streamsize>(std::min<std::uint64_t>(left, zeros.size())));
+    }
+}
+
+void RecordingCompaction::writeStreams(std::ostream& out) {
+    MetaDataSection section(out, recording_.container());
+    for (const StreamInfo& stream : streams_)
+        section.add([&](std::ostream& output) {
+            const ByteSource bytes = recording_.bytes().part(stream.offset, stream.declaredBytes);
+            const auto extent = measureStream(bytes);
+            const std::uint64_t whole = extent ? extent->wholeBytes : bytes.size();
+            appendBytes(bytes.part(0, whole), output);
+            bytesCut_ += stream.declaredBytes - whole;
+            return true;
+        });
+    try {
+        section.finish();
+    } catch (const std::length_error& error) {
+        throw CompactionError(Reason::TooLarge, error.what());
+    }
+}
+
+} // namespace ZULMetaData
