@@ -152,12 +152,10 @@ py::array entriesOfKind(const StreamSource::Bytes& stream) {
 } // namespace
 
 const MetaDataKind& kindNamed(const std::string& name) {
-    const auto found = std::find_if(s_metaDataKinds.begin(), s_metaDataKinds.end(), [&name](const MetaDataKind& kind) {
-        return kind.name == name && RecordedKinds::visit(kind.type, []<class Kind>() {});
-    });
-    if (found == s_metaDataKinds.end())
+    const MetaDataKind* kind = findMetaDataKind(name);
+    if (!kind || !RecordedKinds::visit(kind->type, []<class Kind>() {}))
         throw py::key_error(name);
-    return *found;
+    return *kind;
 }
 
 py::dtype typeOfEntries(const uuid& kind) {

@@ -1,11 +1,14 @@
 #include "Tools/zulm/AttachTimes.h"
+#include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
@@ -47,9 +50,9 @@ struct Streams {
 uuid typeOfStreamFile(const std::string& path) {
     requireFile(path);
     std::ifstream file = openInput(path);
-    const RecognizedContainer recognized = orUnreadable(path, [&] { return recognizeContainer(file, path); });
+    const RecognizedContainer recognized = orFileError(path, [&] { return recognizeContainer(file, path); });
     if (recognized.type == Container::RawStream)
-        return Recording(path).parser().getAvailableMetaDataUUIDs().front();
+        return openRecording(path).streams().front().type;
     if (recognized.type == Container::Unknown)
         throw Failure(fmt::format("{}: not a stream file (.dat): it {}", path, recognized.refusal()));
     throw Failure(
@@ -60,7 +63,7 @@ uuid typeOfStreamFile(const std::string& path) {
 void takeStreamFiles(const AttachOptions& options, Streams& streams) {
     for (const std::string& path : options.streams) {
         const uuid type = typeOfStreamFile(path);
-        if (Recording(path).size() == 0) {
+        if (std::filesystem::file_size(path) == 0) {
             complain(fmt::format("{}: is empty, as nothing was recorded into it; it was left out", path));
             streams.empty.push_back(path);
             streams.code = ExitDamaged;
@@ -79,12 +82,12 @@ void complainAboutOldMovie(const std::string& path, const std::string& what, Str
 
 /// Where the children of a metadata atom or chunk do not end where it does, not all of them were found.
 bool hasUnreachableStreams(Recording& recording) {
-    std::istream& stream = recording.parser().getStream();
-    const Container::Type container = recording.parser().getStreamType();
+    std::istream& stream = recording.input();
+    const Container::Type container = recording.container();
     const bool isMovie = container == Container::QuickTime;
     const std::uint64_t total = recording.size();
     for (const ContainerItem& item : listTopLevel(stream, container)) {
-        if (item.type != "ZULM")
+        if (!item.holdsMetaData())
             continue;
         const auto children = (isMovie ? listAtoms : listChunks)(stream, item.payloadOffset(), item.end(), total);
         std::uint64_t end = children.empty() ? item.payloadOffset() : children.back().end();
@@ -97,26 +100,21 @@ bool hasUnreachableStreams(Recording& recording) {
 }
 
 void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
-    Recording old(options.from);
-    MetaDataParser& parser = old.parser();
-    for (const uuid& type : parser.getAvailableMetaDataUUIDs()) {
-        if (options.replace && streams.types.contains(type))
+    Recording old = openRecording(options.from);
+    for (const StreamInfo& stream : old.streams()) {
+        if (options.replace && streams.types.contains(stream.type))
             continue; // a stream file takes its place
-        const auto [offset, length] = parser.fileDataForUUID(type);
-        const std::uint64_t total = old.size();
-        if (length < s_metaDataHeaderSize || length >= s_negativeLength) {
-            complainAboutOldMovie(
-                options.from,
-                fmt::format("{} at offset {} lies in an atom without room for it", metaDataKindName(type), offset),
-                streams);
+        const std::string place = fmt::format("{} at offset {}", stream.name(), stream.offset);
+        if (stream.declaredBytes < s_metaDataHeaderSize || stream.declaredBytes >= s_negativeLength) {
+            complainAboutOldMovie(options.from, place + " lies in an atom without room for it", streams);
             continue;
         }
-        if (length > total - offset)
+        if (stream.isCutShort())
             complainAboutOldMovie(options.from,
-                                  fmt::format("{} at offset {} declares {} bytes, {} of which are there",
-                                              metaDataKindName(type), offset, length, total - offset),
+                                  fmt::format("{} declares {} bytes, {} of which are there", place,
+                                              stream.declaredBytes, stream.presentBytes),
                                   streams);
-        streams.sources.push_back(StreamSource::part(options.from, offset, length));
+        streams.sources.push_back(StreamSource::part(options.from, stream.offset, stream.declaredBytes));
     }
     if (hasUnreachableStreams(old))
         complainAboutOldMovie(options.from, "its metadata cannot be walked to the end", streams);
@@ -144,8 +142,7 @@ void print(const std::string& name, const AttachResult& attached) {
 }
 
 Json streamDocument(const AttachedStream& stream) {
-    const MetaDataKind* kind = findMetaDataKind(stream.type);
-    Json document{{"source", stream.name},         {"kind", kind ? Json(kind->name) : Json(nullptr)},
+    Json document{{"source", stream.name},         {"kind", kindDocument(stream.type)},
                   {"uuid", uuidText(stream.type)}, {"offset", stream.offset},
                   {"bytes", stream.bytes},         {"entries", stream.entries},
                   {"bytes_cut", stream.bytesCut}};

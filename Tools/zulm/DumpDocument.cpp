@@ -2,37 +2,20 @@
 
 #include "Tools/zulm/EntryFormat.h"
 #include "Tools/zulm/Report.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 namespace Zulm {
 
 using namespace ZULMetaData;
 
-namespace {
-
-template <class Kind>
-class EntryWriter final : public DataStreamObserver<typename Kind::Value> {
-public:
-    explicit EntryWriter(DumpDocument& document) : document_(document) {}
-
-    bool dataRead(double time, const typename Kind::Value& value) override {
-        document_.add(entryDocument<Kind>(time, value));
-        return true;
-    }
-
-private:
-    DumpDocument& document_;
-};
-
-} // namespace
-
 void DumpDocument::beginFile(const Recording& recording) {
     writer_.beginObject();
     writer_.members(fileHeader(recording.name()));
-    writer_.member("container", recording.container());
+    writer_.member("container", containerName(recording.container()));
     writer_.beginArray("streams");
 }
 
-void DumpDocument::beginStream(const StreamInfo& stream, bool isDecoded) {
+void DumpDocument::beginStream(const StreamReport& stream, bool isDecoded) {
     isDecoded_ = isDecoded;
     writer_.beginObject();
     writer_.members(
@@ -54,19 +37,19 @@ void DumpDocument::endFile() {
     writer_.end();
 }
 
-void writeDump(Recording& recording, const std::vector<uuid>& types, const TextSink& sink) {
+void writeDump(Recording& recording, const std::vector<StreamReport>& streams, const TextSink& sink) {
     JsonWriter writer(sink, JsonWriter::Style::Lines);
     beginReport(writer, "dump");
     DumpDocument document(writer);
     document.beginFile(recording);
-    for (const uuid& type : types) {
-        const StreamInfo stream = recording.streamInfo(type);
-        document.beginStream(stream, stream.isDecodable);
-        if (stream.isDecodable)
-            RecordedKinds::visit(type, [&]<class Kind>() {
-                EntryWriter<Kind> entries(document);
-                recording.readEntries<typename Kind::Value>(stream, entries);
+    for (const StreamReport& stream : streams) {
+        document.beginStream(stream, isDecodable(stream.header()));
+        RecordedKinds::visit(stream.type, [&]<class Kind>() {
+            recording.readEntries<typename Kind::Value>(stream, [&](double time, const auto& value) {
+                document.add(entryDocument<Kind>(time, value));
+                return true;
             });
+        });
         document.endStream();
     }
     document.endFile();

@@ -1,7 +1,7 @@
 #include "Tools/zulm/Layout.h"
 
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/Text.h"
+#include "ZULMetaDataBridge/Source/Recording.h"
 
 #include <fmt/core.h>
 
@@ -36,8 +36,7 @@ private:
 class Walk {
 public:
     Walk(Recording& recording, LayoutPart part, const LayoutVisitor& visitor)
-        : name_(recording.name()), parser_(recording.parser()), fileSize_(recording.size()), part_(part),
-          visitor_(visitor) {}
+        : recording_(recording), fileSize_(recording.size()), part_(part), visitor_(visitor) {}
 
     void run() { walk(0, fileSize_, false); }
 
@@ -67,17 +66,17 @@ private:
         visitor_.item(item, isInsideMetaData);
         if (!item.isMetaData)
             return;
-        const PositionKept kept(parser_.getStream());
+        const PositionKept kept(recording_.input());
         walk(item.item.payloadOffset(), std::min(item.item.end(), end), true);
         visitor_.childrenEnd();
     }
 
-    bool isMovie() const { return parser_.getStreamType() == Container::QuickTime; }
+    bool isMovie() const { return recording_.container() == Container::QuickTime; }
     const char* what() const { return isMovie() ? "atom" : "chunk"; }
 
     void visit(std::uint64_t begin, std::uint64_t end, const ContainerVisitor& visitor) {
-        (isMovie() ? visitAtoms : visitChunks)(parser_.getStream(), begin, end, fileSize_, visitor);
-        requireRead(parser_.getStream(), name_);
+        (isMovie() ? visitAtoms : visitChunks)(recording_.input(), begin, end, fileSize_, visitor);
+        recording_.requireRead();
     }
 
     LayoutItem entryFor(const ContainerItem& found, bool isInsideMetaData) {
@@ -94,11 +93,11 @@ private:
 
     std::optional<uuid> streamAt(std::uint64_t offset) {
         MetaDataHeader header;
-        std::istream& stream = parser_.getStream();
+        std::istream& stream = recording_.input();
         const PositionKept kept(stream);
         stream.seekg(static_cast<std::streamoff>(offset));
         const bool isThere = !stream.read(reinterpret_cast<char*>(&header), sizeof header).fail();
-        requireRead(stream, name_);
+        recording_.requireRead();
         if (!isThere)
             return std::nullopt;
         return header.uuid;
@@ -130,8 +129,7 @@ private:
         return {};
     }
 
-    const std::string& name_;
-    MetaDataParser& parser_;
+    Recording& recording_;
     std::uint64_t fileSize_;
     LayoutPart part_;
     const LayoutVisitor& visitor_;
@@ -146,7 +144,7 @@ std::string LayoutItem::headerForm() const {
 }
 
 void walkLayout(Recording& recording, LayoutPart part, const LayoutVisitor& visitor) {
-    if (recording.parser().getStreamType() != Container::RawStream)
+    if (recording.container() != Container::RawStream)
         Walk(recording, part, visitor).run();
 }
 

@@ -1,8 +1,11 @@
 #include "Tools/zulm/MetaDataTail.h"
 
+#include "Tools/zulm/Failure.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Text.h"
 #include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/RepairPlan.h"
+#include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
 #include <fmt/core.h>
 
@@ -79,29 +82,28 @@ void inPieces(const ReadBytes& read, const std::string& name, std::uint64_t offs
 
 MetaDataTail::MetaDataTail(Recording& recording, KeptMetaData kept)
     : recording_(recording), kept_(kept), size_(recording.size()) {
-    MetaDataParser& parser = recording_.parser();
-    if (parser.getStreamType() == Container::RawStream)
+    if (recording_.container() == Container::RawStream)
         throw Failure(fmt::format("{}: is a stream alone, without a movie around it", recording_.name()));
-    items_ = listTopLevel(parser.getStream(), parser.getStreamType());
-    requireRead(parser.getStream(), recording_.name());
+    items_ = listTopLevel(recording_.input(), recording_.container());
+    recording_.requireRead();
     requireWholeContainer();
     findTail();
     chooseCreators();
     if (kept_ == KeptMetaData::Newest) {
         requireReachableStreams();
-        streams_ = heldStreams(recording_);
+        streams_ = recording_.streams();
     }
     streamsLeftOut_ = recording_.validation().streamCount - streams_.size();
 }
 
 bool MetaDataTail::isMovie() const {
-    return recording_.parser().getStreamType() == Container::QuickTime;
+    return recording_.container() == Container::QuickTime;
 }
 
 void MetaDataTail::requireWholeContainer() const {
     const std::string& name = recording_.name();
     const RepairPlan plan =
-        orUnreadable(name, [&] { return isMovie() ? planRepair(recording_.parser().getStream()) : RepairPlan(); });
+        orFileError(name, [&] { return isMovie() ? planRepair(recording_.input()) : RepairPlan(); });
     if (plan.state == RepairPlan::Repairable)
         throw Failure(
             fmt::format("{}: {}; 'zulm repair {} -o OUT' mends it first", name, plan.finding, shellWord(name)));
@@ -201,15 +203,15 @@ void MetaDataTail::blankEarlierMetaData(const std::string& path, const std::stri
 
 void MetaDataTail::attachStreams(const std::string& path, const std::string& name) {
     std::vector<StreamSource> sources;
-    for (const HeldStream& held : streams_)
-        sources.push_back(StreamSource::part(recording_.path(), held.offset, held.present));
+    for (const StreamInfo& held : streams_)
+        sources.push_back(StreamSource::part(recording_.path(), held.offset, held.presentBytes));
     if (sources.empty())
         return;
     try {
         const AttachResult attached =
             SafeMovieSave(path).attach(sources, SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Unchecked);
         for (std::size_t i = 0; i < streams_.size(); ++i)
-            bytesCut_ += attached.streams[i].bytesCut + streams_[i].declared - streams_[i].present;
+            bytesCut_ += attached.streams[i].bytesCut + streams_[i].declaredBytes - streams_[i].presentBytes;
     } catch (const SaveError& error) {
         throw Failure(fmt::format("{}: {}", name, error.sentence()));
     }
@@ -217,8 +219,8 @@ void MetaDataTail::attachStreams(const std::string& path, const std::string& nam
 
 void MetaDataTail::appendChunks(const std::string& path, const std::string& name) const {
     std::uint64_t size = 0;
-    for (const HeldStream& held : streams_)
-        size += detail::s_chunkHeaderSize + padded(held.present);
+    for (const StreamInfo& held : streams_)
+        size += detail::s_chunkHeaderSize + padded(held.presentBytes);
     if (size > s_most32)
         throw Failure(fmt::format("{}: {} bytes of metadata are more than a chunk can hold", recording_.name(), size));
     std::fstream file = openForChange(path, name, std::ios::ate);
@@ -229,11 +231,11 @@ void MetaDataTail::appendChunks(const std::string& path, const std::string& name
     if (!streams_.empty())
         writeHeader(detail::s_metaDataAtom, size);
     const ReadBytes read = recording_.bytes();
-    for (const HeldStream& held : streams_) {
-        writeHeader(detail::s_streamAtom, held.present);
-        inPieces(read, recording_.name(), held.offset, held.present,
+    for (const StreamInfo& held : streams_) {
+        writeHeader(detail::s_streamAtom, held.presentBytes);
+        inPieces(read, recording_.name(), held.offset, held.presentBytes,
                  [&](std::string_view piece) { writeTo(file, piece); });
-        writeTo(file, std::string_view("\0", held.present % 2));
+        writeTo(file, std::string_view("\0", held.presentBytes % 2));
     }
     requireWritten(file, name);
 }

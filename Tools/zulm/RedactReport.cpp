@@ -4,6 +4,7 @@
 #include "Tools/zulm/Report.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/Text.h"
+#include "ZULMetaData/StreamEntries.h"
 
 #include <fmt/core.h>
 

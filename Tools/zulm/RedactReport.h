@@ -3,7 +3,6 @@
 // What a redaction does, as text and as JSON.
 
 #include "Tools/zulm/JsonWriter.h"
-#include "Tools/zulm/Recording.h"
 #include "ZULMetaDataBridge/Source/RecordingRedaction.h"
 
 #include <functional>

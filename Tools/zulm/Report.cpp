@@ -37,6 +37,11 @@ void addText(Json& document, const std::string& key, const std::string& bytes) {
         document[key + "_base64"] = base64(bytes);
 }
 
+Json kindDocument(const ZULMetaData::uuid& type) {
+    const ZULMetaData::MetaDataKind* kind = ZULMetaData::findMetaDataKind(type);
+    return kind ? Json(kind->name) : Json(nullptr);
+}
+
 Json numberDocument(std::optional<double> number) {
     if (!number || std::isfinite(*number))
         return number ? Json(*number) : Json(nullptr);

@@ -44,7 +44,7 @@ std::string metaDataExcerpt(MetaDataParser& recording) {
     for (const ContainerItem& item : items) {
         if (item.type == "RIFF" && item.offset == 0)
             excerpt += emptyRIFF(bytesOf(read, total, 0, item.headerSize + 4));
-        if (item.type == "ftyp" || item.type == "ZULR" || item.holdsMetaData())
+        if (item.type == "ftyp" || item.holdsRecordingInfo() || item.holdsMetaData())
             excerpt += bytesOf(read, total, item.offset, std::max(item.end(), item.offset));
         if (recording.getStreamType() == Container::Riff)
             excerpt.resize(excerpt.size() + excerpt.size() % 2);
