@@ -1,9 +1,9 @@
+#include "Reports/Layout.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/Layout.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>

@@ -1,3 +1,4 @@
+#include "Reports/Text.h"
 #include "Tools/zulm/AttachTimes.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
@@ -5,7 +6,6 @@
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 #include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"

@@ -1,7 +1,7 @@
 #include "Tools/zulm/ChosenStreams.h"
 
+#include "Reports/Text.h"
 #include "Tools/zulm/Choice.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 #include <fmt/ranges.h>

@@ -1,9 +1,9 @@
 #include "Tools/zulm/Command.h"
 
+#include "Reports/Text.h"
 #include "SharedDependencies/EndianFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
-#include "Tools/zulm/Text.h"
 #include "ZULMetaDataBridge/Source/FileError.h"
 
 #include <fmt/color.h>

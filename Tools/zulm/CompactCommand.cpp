@@ -1,6 +1,7 @@
 // The commands that write a recording anew with less metadata: compact and detach.
 
 #include "Platform/DurableFile.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"
@@ -10,7 +11,6 @@
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 

@@ -1,10 +1,10 @@
+#include "Reports/Text.h"
 #include "Tools/zulm/CaptionFormat.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 

@@ -1,11 +1,11 @@
+#include "Reports/EntryFormat.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/ChosenStreams.h"
-#include "Tools/zulm/EntryFormat.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 

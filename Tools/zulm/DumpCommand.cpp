@@ -1,9 +1,10 @@
+#include "Reports/EntryFormat.h"
+#include "Reports/Findings.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/Command.h"
-#include "Tools/zulm/EntryFormat.h"
 #include "Tools/zulm/FileAccess.h"
-#include "Tools/zulm/Findings.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Printout.h"
@@ -11,7 +12,6 @@
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 

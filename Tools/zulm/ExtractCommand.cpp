@@ -1,3 +1,4 @@
+#include "Reports/Text.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/FileAccess.h"
 #include "Tools/zulm/InputFile.h"
@@ -5,7 +6,6 @@
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 

@@ -1,9 +1,9 @@
+#include "Reports/Text.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 #include "Tools/zulm/TextPattern.h"
 
 #include <fmt/core.h>

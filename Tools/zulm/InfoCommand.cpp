@@ -1,11 +1,11 @@
+#include "Reports/Findings.h"
+#include "Reports/InfoReport.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/Command.h"
-#include "Tools/zulm/Findings.h"
-#include "Tools/zulm/InfoReport.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>

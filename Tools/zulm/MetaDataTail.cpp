@@ -1,8 +1,8 @@
 #include "Tools/zulm/MetaDataTail.h"
 
+#include "Reports/Text.h"
 #include "Tools/zulm/Failure.h"
 #include "Tools/zulm/OutputFile.h"
-#include "Tools/zulm/Text.h"
 #include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/Containers/RepairPlan.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"

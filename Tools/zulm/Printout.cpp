@@ -1,8 +1,8 @@
 #include "Tools/zulm/Printout.h"
 
+#include "Reports/Text.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <CLI/CLI.hpp>
 #include <fmt/core.h>

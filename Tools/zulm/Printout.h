@@ -2,8 +2,8 @@
 
 // Everything that one run of `zulm dump` prints, in its format.
 
-#include "Tools/zulm/DumpDocument.h"
-#include "Tools/zulm/EntryFormat.h"
+#include "Reports/DumpDocument.h"
+#include "Reports/EntryFormat.h"
 
 #include <nlohmann/json.hpp>
 

@@ -1,3 +1,4 @@
+#include "Reports/Text.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/InputFile.h"
@@ -8,7 +9,6 @@
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/Settings.h"
-#include "Tools/zulm/Text.h"
 #include "Tools/zulm/TextPattern.h"
 
 #include <fmt/core.h>

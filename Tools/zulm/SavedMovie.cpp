@@ -1,10 +1,10 @@
 #include "Tools/zulm/SavedMovie.h"
 
+#include "Reports/Text.h"
 #include "Tools/zulm/EndingSignals.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>

@@ -1,10 +1,10 @@
+#include "Reports/Layout.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/Layout.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
-#include "Tools/zulm/Text.h"
 #include "Tools/zulm/ViewerPage.h"
 
 #include "SharedDependencies/EndianFile.h"

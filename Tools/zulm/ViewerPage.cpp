@@ -1,9 +1,9 @@
 #include "Tools/zulm/ViewerPage.h"
 
-#include "Tools/zulm/InfoReport.h"
-#include "Tools/zulm/Report.h"
-#include "Tools/zulm/Text.h"
-#include "Tools/zulm/VerifyReport.h"
+#include "Reports/InfoReport.h"
+#include "Reports/Report.h"
+#include "Reports/Text.h"
+#include "Reports/VerifyReport.h"
 #include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 
 #include <fmt/core.h>

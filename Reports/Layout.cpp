@@ -1,6 +1,6 @@
-#include "Tools/zulm/Layout.h"
+#include "Reports/Layout.h"
 
-#include "Tools/zulm/Text.h"
+#include "Reports/Text.h"
 #include "ZULMetaDataBridge/Source/Recording.h"
 
 #include <fmt/core.h>

@@ -3,7 +3,7 @@
 // What `zulm dump --format json` prints, written as the entries are read: an hour of recording does not have to fit
 // into memory as a document.
 
-#include "Tools/zulm/JsonWriter.h"
+#include "Reports/JsonWriter.h"
 #include "ZULMetaDataBridge/Source/Recording.h"
 
 #include <vector>

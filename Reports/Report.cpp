@@ -1,6 +1,6 @@
-#include "Tools/zulm/Report.h"
+#include "Reports/Report.h"
 
-#include "Tools/zulm/Text.h"
+#include "Reports/Text.h"
 
 #include <cmath>
 

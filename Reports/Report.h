@@ -2,7 +2,7 @@
 
 // The JSON documents of the commands that report.
 
-#include "Tools/zulm/JsonWriter.h"
+#include "Reports/JsonWriter.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
 
 #include <nlohmann/json.hpp>

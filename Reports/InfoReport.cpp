@@ -1,8 +1,8 @@
-#include "Tools/zulm/InfoReport.h"
+#include "Reports/InfoReport.h"
 
-#include "Tools/zulm/Findings.h"
-#include "Tools/zulm/Report.h"
-#include "Tools/zulm/Text.h"
+#include "Reports/Findings.h"
+#include "Reports/Report.h"
+#include "Reports/Text.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>

@@ -1,4 +1,4 @@
-#include "Tools/zulm/Findings.h"
+#include "Reports/Findings.h"
 
 #include <fmt/core.h>
 

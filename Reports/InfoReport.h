@@ -2,8 +2,8 @@
 
 // What `zulm info` tells of a file.
 
-#include "Tools/zulm/JsonWriter.h"
-#include "Tools/zulm/Layout.h"
+#include "Reports/JsonWriter.h"
+#include "Reports/Layout.h"
 #include "ZULMetaDataBridge/Source/Recording.h"
 
 #include <nlohmann/json.hpp>

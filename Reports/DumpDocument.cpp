@@ -1,7 +1,7 @@
-#include "Tools/zulm/DumpDocument.h"
+#include "Reports/DumpDocument.h"
 
-#include "Tools/zulm/EntryFormat.h"
-#include "Tools/zulm/Report.h"
+#include "Reports/EntryFormat.h"
+#include "Reports/Report.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 namespace Zulm {
