@@ -101,6 +101,18 @@ inline constexpr std::array<MetaDataKind, 23> s_metaDataKinds{{
     {"hoverRect", s_hoverRectUUID, 1},
 }};
 
+namespace detail {
+
+/// Returns the version of a registered kind. Another identifier does not compile.
+consteval int versionOf(const uuid& type) {
+    for (const MetaDataKind& kind : s_metaDataKinds)
+        if (kind.type == type)
+            return kind.currentVersion;
+    throw "this kind is not registered";
+}
+
+} // namespace detail
+
 /// Return the registered kind with this identifier or with this name, or null. Print nothing, unlike
 /// `currentVersionForUUID`.
 ///@{
