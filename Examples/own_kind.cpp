@@ -28,8 +28,7 @@ void record(const FileLocation& file) {
 void read(const FileLocation& movie) {
     const auto parser = MetaDataParser::create(movie.string());
     const auto place = parser->fileDataForUUID(s_heartRateUUID);
-    const StreamSource::Bytes bytes = StreamSource::part(movie, place.offset, place.length).open();
-    StreamEntries entries(bytes.read, bytes.length);
+    StreamEntries entries(ByteSource::stream(parser->getStream()).part(place.offset, place.length));
     while (const auto entry = entries.next())
         if (const auto decoded = decodeEntry<float>(entries.bytesOf(*entry), s_version))
             std::cout << decoded->time << " s: " << decoded->value << " beats a minute\n";
@@ -46,9 +45,7 @@ int main(int count, char** arguments) {
         const FileLocation movie = arguments[1];
         const FileLocation file = movie.parent_path() / "heartRate.dat";
         record(file);
-        // A kind of one's own is not registered, so that it must be asked for.
-        SafeMovieSave(movie).attach({StreamSource::file(file)}, SafeMovieSave::Existing::Refuse,
-                                    SafeMovieSave::Sources::Unchecked);
+        SafeMovieSave(movie).attach({StreamSource::file(file).unchecked()}); // the kind is not a registered one
         read(movie);
     } catch (const std::exception& error) {
         std::cerr << error.what() << '\n';

@@ -33,15 +33,15 @@ void scan(std::istream& stream, std::string_view bytes) {
 void runTarget(std::string_view bytes) {
     std::istringstream stream{std::string(bytes)};
     scan(stream, bytes);
-    for (const ContainerItem& item : listTopLevel(stream, s_type))
+    for (const ContainerItem& item : topLevelItems(ByteSource::stream(stream), s_type))
         if (item.offset + item.headerSize > bytes.size())
             Fuzz::fail("a header that is not there");
-    const ValidationReport report = validateRecording(stream, s_type);
+    const ValidationReport report = validateRecording(ByteSource::stream(stream), s_type);
     for (const StreamReport& found : report.streams)
         if (found.offset + found.presentBytes > bytes.size() || found.readableBytes > found.presentBytes)
             Fuzz::fail("the validator counts bytes that are not there");
     stream.clear();
-    for (const SalvagedStream& found : StreamSalvage(stream, s_type).run().streams)
+    for (const SalvagedStream& found : StreamSalvage(ByteSource::stream(stream), s_type).run().streams)
         if (found.end() > bytes.size())
             Fuzz::fail("bytes are salvaged that are not there");
     if (Fuzz::hasRefusedMemory())

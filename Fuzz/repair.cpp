@@ -5,15 +5,13 @@
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
 #include <cstring>
-#include <sstream>
 
 using namespace ZULMetaData;
 
 namespace {
 
 RepairPlan planFor(const std::string& movie) {
-    std::istringstream stream(movie);
-    return planRepair(stream);
+    return planRepair(ByteSource::memory(movie));
 }
 
 std::string carriedOut(std::string movie, const RepairPlan& plan) {

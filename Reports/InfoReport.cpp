@@ -50,7 +50,7 @@ std::string shownCreator(const CreatorAttributes& creator) {
 namespace {
 
 Json foreignDocument(const LayoutItem& atom) {
-    return {{"type", printable(atom.item.type)}, {"offset", atom.item.offset}, {"size", atom.size}};
+    return {{"type", printable(atom.item.type.text())}, {"offset", atom.item.offset}, {"size", atom.size}};
 }
 
 } // namespace

@@ -1,7 +1,5 @@
 #include "ZULMetaData/PositionedInput.h"
 
-#include "ZULMetaData/Containers/AtomFormat.h"
-
 #include <limits>
 
 namespace ZULMetaData::detail {
@@ -41,32 +39,6 @@ bool PositionedInput::readStream(void* bytes, std::size_t size) {
     const auto got = static_cast<std::uint64_t>(stream_.gcount());
     position_ = streamPosition_ += got;
     return got == size;
-}
-
-bool PositionedInput::readBigEndian(std::uint32_t& value) {
-    if (!read(&value, sizeof value))
-        return false;
-    value = swapInt(value);
-    return true;
-}
-
-bool PositionedInput::readBigEndian(std::uint64_t& value) {
-    if (!read(&value, sizeof value))
-        return false;
-    value = swapInt(value);
-    return true;
-}
-
-bool PositionedInput::readAtomSizeAndType(std::uint64_t& size, std::uint32_t& type) {
-    std::uint32_t shortSize = 0;
-    if (!enoughBytesLeft(s_atomHeaderSize) || !readBigEndian(shortSize) || !readBigEndian(type))
-        return false;
-    size = shortSize;
-    return shortSize >= s_atomHeaderSize || readBigEndian(size);
-}
-
-bool PositionedInput::readChunkTypeAndSize(std::uint32_t& type, std::uint32_t& size) {
-    return read(&type, sizeof type) && read(&size, sizeof size);
 }
 
 } // namespace ZULMetaData::detail

@@ -2,6 +2,7 @@
 
 // An input stream whose position is counted instead of asked for, bounded by the size of its file.
 
+#include "SharedDependencies/EndianFile.h"
 #include "SharedDependencies/Export.h"
 #include "ZULMetaData/StreamBufferAccess.h"
 
@@ -29,14 +30,13 @@ public:
     /// Reads exactly `size` bytes. False where they reach beyond the total or fail to come.
     bool read(void* bytes, std::size_t size) { return readBuffered(bytes, size) || readStream(bytes, size); }
 
-    bool readBigEndian(std::uint32_t& value);
-    bool readBigEndian(std::uint64_t& value);
-
-    /// Any 32-bit size below 8 announces an extended size. `size` counts the whole atom, header included.
-    bool readAtomSizeAndType(std::uint64_t& size, std::uint32_t& type);
-
-    /// `type` as it is stored. `size` counts the data alone.
-    bool readChunkTypeAndSize(std::uint32_t& type, std::uint32_t& size);
+    template <class Integer>
+    bool readBigEndian(Integer& value) {
+        if (!read(&value, sizeof value))
+            return false;
+        value = swapInt(value);
+        return true;
+    }
 
 private:
     bool readBuffered(void* bytes, std::size_t size);

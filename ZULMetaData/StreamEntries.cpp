@@ -11,21 +11,12 @@ namespace ZULMetaData {
 
 namespace {
 
-constexpr std::size_t s_windowSize = 1 << 16;
-
 using Size = std::uint32_t;
-
-template <class Number>
-Number numberAt(std::string_view bytes, std::size_t offset) {
-    Number number{};
-    std::memcpy(&number, bytes.data() + offset, sizeof number);
-    return number;
-}
 
 /// A text as it is stored: size, time, characters.
 bool isText(std::string_view bytes) {
     constexpr std::size_t leastSize = sizeof(Size) + sizeof(double);
-    return bytes.size() >= leastSize && numberAt<Size>(bytes, 0) == bytes.size() - sizeof(Size);
+    return bytes.size() >= leastSize && detail::numberIn<Size>(bytes, 0) == bytes.size() - sizeof(Size);
 }
 
 /// An input stream over bytes of somebody else.
@@ -39,18 +30,15 @@ public:
 
 } // namespace
 
-StreamEntries::StreamEntries(ReadBytes read, std::uint64_t length) : read_(std::move(read)), length_(length) {
-    const std::string_view bytes = bytesAt(0, s_metaDataHeaderSize);
-    if (length_ < s_metaDataHeaderSize || bytes.size() < s_metaDataHeaderSize)
-        return;
-    header_ = numberAt<MetaDataHeader>(bytes, 0);
-    entrySize_ = header_->fixedEntrySize;
-    position_ = s_metaDataHeaderSize;
+StreamEntries::StreamEntries(ByteSource stream)
+    : reader_(std::move(stream)), header_(reader_.numberAt<MetaDataHeader>(0)) {
+    if (header_)
+        position_ = s_metaDataHeaderSize;
 }
 
 std::optional<StreamEntry> StreamEntries::next() {
     end_ = StreamExtent::AtEntry;
-    if (!header_ || position_ == length_)
+    if (!header_ || position_ == reader_.size())
         return std::nullopt;
     const std::optional<std::uint64_t> size = sizeOfNext();
     if (!size)
@@ -61,38 +49,38 @@ std::optional<StreamEntry> StreamEntries::next() {
 }
 
 std::optional<std::uint64_t> StreamEntries::sizeOfNext() {
-    std::uint64_t size = entrySize_;
-    if (entrySize_ == 0) {
-        const std::string_view bytes = bytesAt(position_, sizeof(Size));
-        const Size behind = bytes.size() == sizeof(Size) ? numberAt<Size>(bytes, 0) : 0;
-        size = sizeof(Size) + std::uint64_t{behind};
-        if (bytes.size() == sizeof(Size) && behind == 0) {
+    std::optional<std::uint64_t> size = header_->fixedEntrySize;
+    if (*size == 0) {
+        const auto following = reader_.numberAt<Size>(position_);
+        if (following == Size{0}) {
             end_ = StreamExtent::EmptyEntry;
             return std::nullopt;
         }
-        if (bytes.size() < sizeof(Size))
-            size = length_; // more than is left
+        size = following ? std::optional(sizeof(Size) + std::uint64_t{*following}) : std::nullopt;
     }
-    if (size <= length_ - position_)
+    if (size && *size <= reader_.size() - position_)
         return size;
     end_ = StreamExtent::InsideEntry;
     return std::nullopt;
 }
 
-std::string_view StreamEntries::bytesOf(const StreamEntry& entry) {
-    return bytesAt(entry.offset, entry.size);
-}
-
-std::string_view StreamEntries::bytesAt(std::uint64_t position, std::uint64_t size) {
-    const auto wanted = static_cast<std::size_t>(position < length_ ? std::min(size, length_ - position) : 0);
-    if (position < windowStart_ || position + wanted > windowStart_ + windowSize_) {
-        const std::uint64_t most = std::min<std::uint64_t>(std::max(wanted, s_windowSize), length_ - position);
-        window_.resize(std::max(static_cast<std::size_t>(most), std::min(window_.size(), s_windowSize)));
-        windowStart_ = position;
-        windowSize_ = read_(position, {window_.data(), static_cast<std::size_t>(most)});
+std::optional<StreamExtent> measureStream(const ByteSource& stream) {
+    StreamEntries entries(stream);
+    if (!entries.header())
+        return std::nullopt;
+    StreamExtent extent;
+    extent.header = *entries.header();
+    if (const std::uint32_t size = extent.header.fixedEntrySize; size != 0) {
+        extent.entries = (stream.size() - s_metaDataHeaderSize) / size;
+        extent.wholeBytes = s_metaDataHeaderSize + extent.entries * size;
+        extent.end = extent.wholeBytes == stream.size() ? StreamExtent::AtEntry : StreamExtent::InsideEntry;
+        return extent;
     }
-    const auto start = static_cast<std::size_t>(position - windowStart_);
-    return {window_.data() + start, std::min(wanted, windowSize_ - start)};
+    while (entries.next())
+        ++extent.entries;
+    extent.wholeBytes = entries.wholeBytes();
+    extent.end = entries.end();
+    return extent;
 }
 
 namespace detail {
@@ -107,12 +95,12 @@ bool readEntryBytes(std::string_view bytes, double& time, std::string& text) {
 
 bool readEntryBytes(std::string_view bytes, double& time, std::list<std::string>& texts) {
     constexpr std::size_t start = 2 * sizeof(Size);
-    if (bytes.size() < start || numberAt<Size>(bytes, 0) != bytes.size() - sizeof(Size))
+    if (bytes.size() < start || detail::numberIn<Size>(bytes, 0) != bytes.size() - sizeof(Size))
         return false;
     std::string_view rest = bytes.substr(start);
-    for (auto count = numberAt<Size>(bytes, sizeof(Size)); count > 0; --count) {
+    for (auto count = detail::numberIn<Size>(bytes, sizeof(Size)); count > 0; --count) {
         const std::uint64_t size =
-            rest.size() < sizeof(Size) ? 0 : sizeof(Size) + std::uint64_t{numberAt<Size>(rest, 0)};
+            rest.size() < sizeof(Size) ? 0 : sizeof(Size) + std::uint64_t{detail::numberIn<Size>(rest, 0)};
         if (!isText(rest.substr(0, static_cast<std::size_t>(size))))
             return false;
         rest.remove_prefix(static_cast<std::size_t>(size));
@@ -121,7 +109,7 @@ bool readEntryBytes(std::string_view bytes, double& time, std::list<std::string>
         return false;
     BytesInput input(bytes);
     readStringListEntry(input, texts);
-    time = texts.empty() ? 0 : numberAt<double>(bytes, start + sizeof(Size));
+    time = texts.empty() ? 0 : detail::numberIn<double>(bytes, start + sizeof(Size));
     return true;
 }
 

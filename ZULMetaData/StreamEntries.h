@@ -3,20 +3,20 @@
 // Walks along the whole entries of a stream without trusting their sizes. Every entry that is returned lies inside the
 // existing bytes, and an entry is decoded only if the sizes inside it agree with its own size.
 //
-//     StreamEntries entries(readingFrom(file), length);
+//     StreamEntries entries(ByteSource::file("slideTitle.dat"));
 //     while (const auto entry = entries.next())
 //         if (const auto decoded = decodeEntry<std::string>(entries.bytesOf(*entry), entries.header()->version))
 //             std::cout << decoded->time << ' ' << decoded->value << '\n';
 
 #include "../SharedDependencies/Export.h"
-#include "StreamExtent.h"
+#include "ByteReader.h"
+#include "ByteSource.h"
 #include "ZULMMetaDataReader.h"
 #include "ZULMMetaDataUUIDs.h"
 
 #include <cstdint>
 #include <optional>
 #include <string_view>
-#include <vector>
 
 namespace ZULMetaData {
 
@@ -28,24 +28,36 @@ struct StreamEntry {
     std::uint64_t end() const { return offset + size; } ///< returns where the next entry begins
 };
 
-/// Walks forward once and reads large pieces. It needs memory for one entry and little more.
+/// How much of a stream is whole: its header and the entries before the first one that is cut short.
+struct StreamExtent {
+    /// What follows the last whole entry.
+    enum End : std::int32_t {
+        AtEntry,     ///< nothing
+        InsideEntry, ///< an entry whose end is missing; even its size field may be cut short
+        EmptyEntry,  ///< an entry that declares a size of 0; no reader gets past it
+    };
+
+    MetaDataHeader header;        ///< the header as it is stored
+    std::uint64_t wholeBytes = 0; ///< bytes of the header and the whole entries
+    std::uint64_t entries = 0;    ///< the number of whole entries
+    End end = AtEntry;            ///< why the walk ended
+};
+
+/// Walks forward once and reads large pieces. It needs memory for one entry and little more. This is the only walk over
+/// the entries of streams that are not trusted.
 class ZULMETADATA_API StreamEntries {
 public:
-    /// Takes a function that reads the bytes of the stream by their position in it, and the number of these bytes.
-    StreamEntries(ReadBytes read, std::uint64_t length);
+    explicit StreamEntries(ByteSource stream); ///< takes the bytes of the stream, header included
 
     /// Returns the header. It is empty if the stream is shorter than a header; there are no entries then.
     const std::optional<MetaDataHeader>& header() const { return header_; }
-
-    /// Sets the size of every entry; 0 means that each entry has its own size. The default is the size in the header.
-    void setEntrySize(std::uint32_t size) { entrySize_ = size; }
 
     /// Returns the next whole entry, or nothing after the last one.
     std::optional<StreamEntry> next();
 
     /// Returns the bytes of the entry, or fewer if they cannot be read. They are valid until the next call of any
     /// function of this object.
-    std::string_view bytesOf(const StreamEntry& entry);
+    std::string_view bytesOf(const StreamEntry& entry) { return reader_.at(entry.offset, entry.size); }
 
     /// Returns the number of bytes of the header and of the entries returned so far.
     std::uint64_t wholeBytes() const { return position_; }
@@ -53,20 +65,19 @@ public:
     /// Returns what follows the last whole entry, once `next` has returned nothing.
     StreamExtent::End end() const { return end_; }
 
+    detail::ByteReader& reader() { return reader_; } ///< is for the library itself
+
 private:
-    std::string_view bytesAt(std::uint64_t position, std::uint64_t size);
     std::optional<std::uint64_t> sizeOfNext();
 
-    ReadBytes read_;
-    std::uint64_t length_;
+    detail::ByteReader reader_;
     std::optional<MetaDataHeader> header_;
-    std::uint32_t entrySize_ = 0;
     std::uint64_t position_ = 0;
     StreamExtent::End end_ = StreamExtent::AtEntry;
-    std::vector<char> window_;
-    std::uint64_t windowStart_ = 0;
-    std::size_t windowSize_ = 0;
 };
+
+/// Walks along a whole stream. Returns nothing if it is shorter than a header. Entries of equal size are not read.
+ZULMETADATA_API std::optional<StreamExtent> measureStream(const ByteSource& stream);
 
 /// An entry that was decoded.
 template <StreamValue T>

@@ -1,5 +1,6 @@
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
+#include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/Containers/ContainerScan.h"
 #include "ZULMetaData/Containers/FileParser.h"
 #include "ZULMetaData/PositionedInput.h"
@@ -127,11 +128,24 @@ bool enoughBytesLeft(std::istream& stream, std::uint64_t total, std::uint64_t ne
 }
 
 bool readAtomSizeAndType(std::istream& stream, std::uint64_t total, std::uint64_t& size, std::uint32_t& type) {
-    return inputAt(stream, total).readAtomSizeAndType(size, type);
+    detail::PositionedInput input = inputAt(stream, total);
+    ContainerItem atom;
+    if (!readAtomHeader(input, detail::ExtendedSizes::BelowHeader, atom) ||
+        (atom.sizeField < detail::s_atomHeaderSize && !atom.isExtended()))
+        return false;
+    size = atom.size;
+    type = atom.type.value;
+    return true;
 }
 
 bool readChunkTypeAndSize(std::istream& stream, std::uint64_t total, std::uint32_t& type, std::uint32_t& size) {
-    return inputAt(stream, total).readChunkTypeAndSize(type, size);
+    detail::PositionedInput input = inputAt(stream, total);
+    ContainerItem chunk;
+    if (!readChunkHeader(input, chunk))
+        return false;
+    type = swapInt(chunk.type.value);
+    size = chunk.sizeField;
+    return true;
 }
 
 } // namespace ParserUtil

@@ -10,7 +10,6 @@
 #include "CursorImageSchema.h"
 #include "CursorImageWriter.h"
 #include "StreamEntries.h"
-#include "StreamExtent.h"
 #include "ZULMMetaDataCommon.h"
 #include "ZULMMetaDataParser.h"
 #include "ZULMMetaDataReader.h"

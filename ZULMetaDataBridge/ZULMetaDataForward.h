@@ -82,10 +82,14 @@ class TopmostWindowTitleMetaDataParser;
 
 struct AttachResult;
 struct AttachedStream;
+struct CaptionKey;
 class FileError;
 struct Finding;
 struct FindingRule;
 struct HumanReadableActions;
+struct KeyCaption;
+struct KeyEvent;
+struct KeyName;
 class Recording;
 struct RedactedEntry;
 struct RedactedStream;

@@ -82,6 +82,16 @@ export class Recording {
   entries(kind: string): Entries;
   /** Returns the entries of a hidden stream, by its index in `hidden`. */
   hiddenEntries(index: number): Entries;
+  /**
+   * Returns the keys of the stream "keyboardAction" as captions show them, in the order of their times. Throws a
+   * `ZulmError` if there is no such stream. The columns are:
+   *
+   * - `label`, the text of the key. Unless `showsKeys` is true, a bullet takes the place of what was typed.
+   * - `isTyped`, 1 for a character without modifiers, which makes words with its neighbours, or 0.
+   * - `first`, the index of the key that begins its caption.
+   * - `end`, the time in seconds until which its caption is shown.
+   */
+  keyCaptions(showsKeys?: boolean): Entries;
   /** Returns the file's object of `zulm info --json`. */
   info(): object;
   /** Returns the file's object of `zulm verify --json`. */

@@ -262,6 +262,12 @@ export class Recording {
     });
   }
 
+  keyCaptions(showsKeys) {
+    return this.#guarded((core) =>
+      core.takeEntries(core.call('zulm_read_key_captions', this.#handle, showsKeys ? 1 : 0), 'keyboardAction'),
+    );
+  }
+
   info() {
     return this.#guarded((core) => JSON.parse(core.takeText(core.call('zulm_info', this.#handle))));
   }

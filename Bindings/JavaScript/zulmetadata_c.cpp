@@ -1,12 +1,13 @@
 #include "Bindings/JavaScript/zulmetadata_c.h"
 
+#include "Bindings/JavaScript/BlockCache.h"
 #include "Bindings/JavaScript/EntryColumns.h"
-#include "Bindings/JavaScript/SliceBuffer.h"
 #include "Reports/DumpDocument.h"
 #include "Reports/InfoReport.h"
 #include "Reports/JsonWriter.h"
 #include "Reports/Text.h"
 #include "Reports/VerifyReport.h"
+#include "ZULMetaDataBridge/Source/KeyCaptions.h"
 #include "ZULMetaDataBridge/Source/Recording.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 #include "ZULMetaDataBridge/Source/StoredFields.h"
@@ -16,13 +17,12 @@
 #include <algorithm>
 #include <cerrno>
 #include <exception>
-#include <functional>
-#include <istream>
 #include <limits>
 #include <list>
 #include <memory>
 #include <new>
 #include <optional>
+#include <span>
 #include <sstream>
 #include <stdexcept>
 #include <string>
@@ -36,7 +36,6 @@
 using namespace ZULMetaData;
 using namespace ZULMetaData::Bindings;
 
-/// In the order in which they need each other.
 struct ZulmRecording {
     struct Stream {
         StreamReport report;
@@ -45,14 +44,12 @@ struct ZulmRecording {
         ZulmStream summary; // points into these texts
     };
 
-    ZulmRecording(ReadSlice read, std::uint64_t size, const std::string& name)
-        : buffer(std::move(read), size), input(&buffer), recording(input, name), duration(recording.duration()),
-          found(summarized(recording.examinedStreams())), hidden(summarized(recording.hiddenStreams())) {}
+    ZulmRecording(const ByteSource& bytes, const std::string& name)
+        : recording(bytes, name), duration(recording.duration()), found(summarized(recording.examinedStreams())),
+          hidden(summarized(recording.hiddenStreams())) {}
 
     static std::vector<Stream> summarized(const std::vector<StreamReport>& reports);
 
-    SliceBuffer buffer;
-    std::istream input;
     Recording recording;
     std::optional<double> duration;
     std::vector<Stream> found;
@@ -95,12 +92,12 @@ auto orNull(Work work) noexcept -> decltype(work()) {
     return nullptr;
 }
 
-ReadSlice readingWith(ZulmReadAt readAt, void* context) {
-    return [=](std::uint64_t position, void* bytes, std::size_t size) {
-        const std::int64_t got = readAt(context, position, bytes, size);
+ByteSource::Read readingWith(ZulmReadAt readAt, void* context) {
+    return [=](std::uint64_t position, std::span<char> bytes) {
+        const std::int64_t got = readAt(context, position, bytes.data(), bytes.size());
         if (got < 0)
             throw std::system_error(EIO, std::generic_category(), "cannot be read");
-        return std::min(static_cast<std::size_t>(got), size);
+        return std::min(static_cast<std::size_t>(got), bytes.size());
     };
 }
 
@@ -144,14 +141,47 @@ const StreamReport& streamNamed(const ZulmRecording& opened, const std::string& 
     throw std::runtime_error(fmt::format("{}: holds no stream {}", opened.recording.name(), kind));
 }
 
-std::unique_ptr<ZulmEntries> readEntries(ZulmRecording& opened, const StreamReport& stream) {
-    auto entries = std::make_unique<ZulmEntries>();
+void requireDecodable(const ZulmRecording& opened, const StreamReport& stream) {
     if (!isDecodable(stream.header()))
         throw std::runtime_error(fmt::format("{}: entries of {}, version {}, cannot be decoded",
                                              opened.recording.name(), stream.name(), stream.version));
+}
+
+void addViews(ZulmEntries& entries) {
+    for (const EntryColumn& column : entries.columns)
+        entries.views.push_back(column.view());
+}
+
+std::unique_ptr<ZulmEntries> readEntries(ZulmRecording& opened, const StreamReport& stream) {
+    requireDecodable(opened, stream);
+    auto entries = std::make_unique<ZulmEntries>();
     RecordedKinds::visit(stream.type, [&]<class Kind>() { collect<Kind>(opened.recording, stream, *entries); });
-    for (const EntryColumn& column : entries->columns)
-        entries->views.push_back(column.view());
+    addViews(*entries);
+    return entries;
+}
+
+/// One row for each key.
+std::unique_ptr<ZulmEntries> readKeyCaptions(ZulmRecording& opened, bool showsKeys) {
+    const StreamReport& stream = streamNamed(opened, metaDataKindName(KeyboardActionKind::type));
+    requireDecodable(opened, stream);
+    std::vector<KeyEvent> keys;
+    opened.recording.readEntries<KeyStroke>(stream, [&keys](double time, const KeyStroke& key) {
+        keys.push_back({time, key});
+        return true;
+    });
+    auto entries = std::make_unique<ZulmEntries>();
+    entries->columns = {{"label", ZulmTexts}, {"isTyped", ZulmInt32}, {"first", ZulmInt32}, {"end", ZulmReal}};
+    for (const KeyCaption& caption : keyCaptions(std::move(keys), showsKeys)) {
+        const auto first = static_cast<std::int32_t>(entries->times.size());
+        for (const CaptionKey& key : caption.keys) {
+            entries->times.push_back(key.time);
+            entries->columns[0].add(key.label);
+            entries->columns[1].add(std::int32_t{key.isTyped});
+            entries->columns[2].add(first);
+            entries->columns[3].add(caption.end);
+        }
+    }
+    addViews(*entries);
     return entries;
 }
 
@@ -197,7 +227,7 @@ const char* zulm_last_error(void) {
 }
 
 ZulmRecording* zulm_open(ZulmReadAt readAt, void* context, uint64_t size, const char* name) {
-    return orNull([&] { return new ZulmRecording(readingWith(readAt, context), size, name); });
+    return orNull([&] { return new ZulmRecording(cachedInBlocks({size, readingWith(readAt, context)}), name); });
 }
 
 void zulm_close(ZulmRecording* recording) {
@@ -234,6 +264,10 @@ ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind) {
 
 ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index) {
     return orNull([&] { return readEntries(*recording, recording->hidden[index].report).release(); });
+}
+
+ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys) {
+    return orNull([&] { return readKeyCaptions(*recording, showsKeys != 0).release(); });
 }
 
 void zulm_free_entries(ZulmEntries* entries) {

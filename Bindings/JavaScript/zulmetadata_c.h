@@ -93,6 +93,13 @@ typedef struct {
 /* Of the stream of this kind, or with this identifier; as far as they are whole. */
 ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind);
 ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index);
+
+/* The keys of the stream keyboardAction as captions show them, in the order of their times. The columns are "label",
+   the text of the key; "isTyped", 1 if the key makes words with its neighbours that are typed, or 0; "first", the
+   number of the entry that begins its caption; and "end", the seconds until which its caption is shown. If `showsKeys`
+   is 0, bullets take the place of what was typed. */
+ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys);
+
 void zulm_free_entries(ZulmEntries* entries);
 
 size_t zulm_entry_count(const ZulmEntries* entries);

@@ -34,9 +34,12 @@ Recording openRecording(const FileLocation& file) {
 
 /// A stream of a recording, found when the recording was opened.
 struct RecordedStream {
+    FileLocation file;
     StreamInfo place;
     MetaDataHeader header;
-    StreamSource source; ///< opens the file each time
+
+    /// Opens the file when it is used.
+    StreamSource source() const { return StreamSource::part(file, place.offset, place.declaredBytes); }
 };
 
 /// What a recording was found to hold. It keeps no file open.
@@ -48,13 +51,12 @@ struct RecordingFile {
 };
 
 RecordingFile lookInto(const FileLocation& file) {
-    Recording recording = openRecording(file);
+    const Recording recording = openRecording(file);
     RecordingFile found{containerName(recording.container()), recording.duration(), {}, {}};
     for (const ZCAPHeader& info : recording.creators())
         found.creators.push_back(info.creator);
     for (const StreamInfo& stream : recording.streams())
-        found.streams.push_back({stream, recording.entriesOf(stream).header().value_or(MetaDataHeader()),
-                                 StreamSource::part(file, stream.offset, stream.declaredBytes)});
+        found.streams.push_back({file, stream, recording.entriesOf(stream).header().value_or(MetaDataHeader())});
     return found;
 }
 
@@ -62,9 +64,9 @@ py::bytes bytesOf(const RecordedStream& stream) {
     std::string bytes;
     {
         const py::gil_scoped_release others;
-        orFileError(stream.source.name(), [&] {
-            const StreamSource::Bytes opened = stream.source.open();
-            bytes.resize(static_cast<std::size_t>(opened.length));
+        orFileError(utf8Path(stream.file), [&] {
+            const ByteSource opened = stream.source().open();
+            bytes.resize(static_cast<std::size_t>(opened.size()));
             bytes.resize(opened.read(0, bytes));
         });
     }
@@ -72,22 +74,21 @@ py::bytes bytesOf(const RecordedStream& stream) {
 }
 
 /// Stream files, and streams of other recordings.
-std::vector<StreamSource> sourcesOf(const py::iterable& streams) {
+std::vector<StreamSource> sourcesOf(const py::iterable& streams, bool unchecked) {
     std::vector<StreamSource> sources;
-    for (const py::handle stream : streams)
-        if (py::isinstance<RecordedStream>(stream))
-            sources.push_back(stream.cast<RecordedStream>().source);
-        else
-            sources.push_back(StreamSource::file(stream.cast<FileLocation>()));
+    for (const py::handle stream : streams) {
+        const StreamSource source = py::isinstance<RecordedStream>(stream)
+                                        ? stream.cast<RecordedStream>().source()
+                                        : StreamSource::file(stream.cast<FileLocation>());
+        sources.push_back(unchecked ? source.unchecked() : source);
+    }
     return sources;
 }
 
 AttachResult attach(const FileLocation& movie, const py::iterable& streams, bool replace, bool unchecked) {
-    const std::vector<StreamSource> sources = sourcesOf(streams);
+    const std::vector<StreamSource> sources = sourcesOf(streams, unchecked);
     const py::gil_scoped_release others;
-    return SafeMovieSave(movie).attach(sources,
-                                       replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse,
-                                       unchecked ? SafeMovieSave::Sources::Unchecked : SafeMovieSave::Sources::Checked);
+    return SafeMovieSave(movie).attach(sources, replace ? ExistingStreams::Supersede : ExistingStreams::Refuse);
 }
 
 CreatorAttributes stamp(const FileLocation& movie, const py::object& creator, const py::object& version) {
@@ -190,7 +191,7 @@ void addReading(py::module_& module) {
         .def(
             "read",
             [](const RecordedStream& stream) {
-                return orFileError(stream.source.name(), [&] { return readEntries(stream.source); });
+                return orFileError(utf8Path(stream.file), [&] { return readEntries(stream.source()); });
             },
             "Returns the whole entries, as a NumPy array of records.")
         .def("raw", bytesOf, "Returns the bytes of the stream, header included.")

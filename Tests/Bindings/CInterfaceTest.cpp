@@ -146,6 +146,32 @@ TEST_F(CInterface, GivesRealNumbersWithTheDigitsThatTellThem) {
     EXPECT_THAT(valuesOf<double>(entries.get(), 0), testing::ElementsAre(39.00953));
 }
 
+TEST_F(CInterface, ReturnsKeysAsCaptionsShowThem) {
+    const std::string keys = f64(1.25) + le32('i') + le32(0) + f64(1) + le32('h') + le32(0) + f64(1.5) + le32('S') +
+                             le32(0x100000) + f64(5) + le32(13) + le32(0);
+    source_.bytes = streamHeader("2b7b6af5", 1, 16) + keys;
+    const OpenRecording recording = opened(source_, "a.dat");
+    const ReadEntries shown(zulm_read_key_captions(recording.get(), 1));
+    ASSERT_TRUE(shown) << zulm_last_error();
+    ASSERT_EQ(zulm_entry_count(shown.get()), 4U);
+    EXPECT_THAT(std::vector(zulm_entry_times(shown.get()), zulm_entry_times(shown.get()) + 4),
+                testing::ElementsAre(1, 1.25, 1.5, 5));
+    ASSERT_EQ(zulm_column_count(shown.get()), 4U);
+    EXPECT_STREQ(zulm_column(shown.get(), 0)->name, "label");
+    EXPECT_EQ(textOf(shown.get(), 0, 0), "h");
+    EXPECT_EQ(textOf(shown.get(), 0, 2), "\xe2\x8c\x98S");
+    EXPECT_EQ(textOf(shown.get(), 0, 3), "[returnKey]");
+    EXPECT_STREQ(zulm_column(shown.get(), 1)->name, "isTyped");
+    EXPECT_THAT(valuesOf<std::int32_t>(shown.get(), 1), testing::ElementsAre(1, 1, 0, 0));
+    EXPECT_STREQ(zulm_column(shown.get(), 2)->name, "first");
+    EXPECT_THAT(valuesOf<std::int32_t>(shown.get(), 2), testing::ElementsAre(0, 0, 0, 3));
+    EXPECT_STREQ(zulm_column(shown.get(), 3)->name, "end");
+    EXPECT_THAT(valuesOf<double>(shown.get(), 3), testing::ElementsAre(3, 3, 3, 6.5));
+    const ReadEntries masked(zulm_read_key_captions(recording.get(), 0));
+    EXPECT_EQ(textOf(masked.get(), 0, 0), "\xe2\x80\xa2");
+    EXPECT_EQ(textOf(masked.get(), 0, 3), "[returnKey]");
+}
+
 TEST_F(CInterface, GivesWhatALaterStreamOfTheKindHides) {
     const std::string later = streamHeader("2b7b6af2", 1, 16) + pointEntry(1, 8, 9);
     source_.bytes = movieWith(extendedAtom("DATA", locations()) + extendedAtom("DATA", later));
@@ -205,6 +231,8 @@ TEST_F(CInterface, SaysWhatItCannotDo) {
     ASSERT_TRUE(recording);
     EXPECT_FALSE(zulm_read_entries(recording.get(), "slideText"));
     EXPECT_STREQ(zulm_last_error(), "Odd.mp4: holds no stream slideText");
+    EXPECT_FALSE(zulm_read_key_captions(recording.get(), 1));
+    EXPECT_STREQ(zulm_last_error(), "Odd.mp4: holds no stream keyboardAction");
     EXPECT_FALSE(zulm_read_entries(recording.get(), zulm_stream(recording.get(), 0)->uuid));
     EXPECT_THAT(zulm_last_error(), HasSubstr("cannot be decoded"));
     EXPECT_TRUE(std::isnan(zulm_stream(recording.get(), 0)->first) || zulm_stream(recording.get(), 0)->isKnown == 0);
@@ -233,6 +261,7 @@ TEST_F(CInterface, LivesThroughEveryDamagedFile) {
             EXPECT_EQ(entries != nullptr, stream.isKnown == 1) << file.name;
             EXPECT_LE(entries ? zulm_entry_count(entries.get()) : 0, stream.entries) << file.name;
         }
+        const ReadEntries captions(zulm_read_key_captions(recording.get(), 1));
         for (std::size_t i = 0; i < zulm_hidden_count(recording.get()); ++i) {
             const ReadEntries entries(zulm_read_hidden(recording.get(), i));
             EXPECT_EQ(entries != nullptr, zulm_hidden(recording.get(), i)->isKnown == 1) << file.name;

@@ -68,46 +68,6 @@ TEST_F(ConvertCommand, MasksWhatWasTyped) {
     EXPECT_EQ(converted(file, {"srt", "--show-keys"}), "1\n00:00:01,000 --> 00:00:03,000\nPASS 1 [returnKey]\n\n");
 }
 
-TEST_F(ConvertCommand, MasksEveryKeyThatTypesACharacter) {
-    std::string entries;
-    for (std::uint32_t code = 0; code < 0x180; ++code) {
-        const bool isNamed = (code >= 3 && code <= 47 && code != 32) || (code >= 112 && code <= 145) || code == 0;
-        for (const std::uint32_t flags : {0U, s_virtualKey, s_shift, s_command}) {
-            const bool isSpecial = isNamed && (flags == s_virtualKey || code < 32 || code == 127);
-            entries += isSpecial ? "" : key(code, code, flags);
-        }
-    }
-    std::istringstream lines(converted(keys(entries), {"vtt"}));
-    std::getline(lines, entries);
-    for (std::string line; std::getline(lines, line);) {
-        const bool isText = line.find("-->") == std::string::npos;
-        EXPECT_TRUE(!isText || std::none_of(line.begin(), line.end(), [](char c) { return c > ' ' && c <= '~'; }))
-            << line;
-    }
-}
-
-TEST_F(ConvertCommand, ShowsModifiersAsTheirSigns) {
-    const std::string file = keys(key(1, 'C', s_command) + key(3, 9, s_shift) + key(5, 27));
-    const std::string text = converted(file, {"srt"});
-    EXPECT_THAT(text, HasSubstr("\n\xe2\x8c\x98" + s_bullet + "\n"));
-    EXPECT_THAT(text, HasSubstr("\n\xe2\x87\xa7[tab]\n"));
-    EXPECT_THAT(text, HasSubstr("\n[escape]\n"));
-    EXPECT_THAT(converted(file, {"srt", "--show-keys"}), HasSubstr("\n\xe2\x8c\x98"
-                                                                   "C\n"));
-}
-
-TEST_F(ConvertCommand, NamesKeysThatCannotBeCharacters) {
-    EXPECT_THAT(converted(keys(key(1, 115, s_virtualKey) + key(1, 39, s_virtualKey) + key(1, 's')), {"srt"}),
-                HasSubstr("\n[f4] [right] " + s_bullet + "\n"));
-}
-
-TEST_F(ConvertCommand, ShowsWhatVirtualKeysType) {
-    const std::uint32_t shifted = s_virtualKey | s_shift;
-    const std::string file = keys(key(1, 'A', s_virtualKey) + key(1, 'B', shifted) + key(1, '1', s_virtualKey) +
-                                  key(1, '1', shifted) + key(1, 188, s_virtualKey) + key(1, 0x20ac));
-    EXPECT_THAT(converted(file, {"srt", "--show-keys"}), HasSubstr("\naB1!,\xe2\x82\xac\n"));
-}
-
 TEST_F(ConvertCommand, MakesACaptionOfKeysBetweenPauses) {
     const std::string file = keys(typed(1, "ab") + typed(1.9, "c") + typed(3, "d"));
     EXPECT_EQ(converted(file, {"srt", "--show-keys"}),

@@ -9,14 +9,11 @@
 namespace ZULMetaData::Test {
 namespace {
 
-ReadBytes readingOf(const std::string& bytes) {
-    return [bytes](std::uint64_t position, std::span<char> to) {
-        return position < bytes.size() ? bytes.copy(to.data(), to.size(), static_cast<std::size_t>(position)) : 0;
-    };
-}
-
+/// Keeps the bytes.
 StreamEntries entriesOf(const std::string& stream) {
-    return {readingOf(stream), stream.size()};
+    return StreamEntries(ByteSource(stream.size(), [stream](std::uint64_t position, std::span<char> bytes) {
+        return ByteSource::memory(stream).read(position, bytes);
+    }));
 }
 
 std::vector<std::string> allOf(StreamEntries& entries) {
@@ -48,11 +45,6 @@ TEST(StreamEntries, TellsWhereAnEntryIs) {
     EXPECT_EQ(second->offset, 39U);
     EXPECT_EQ(second->size, 17U);
     EXPECT_EQ(second->end(), 56U);
-}
-
-TEST(StreamEntries, HaveNeitherPlaceNorSizeOfTheirOwn) {
-    EXPECT_EQ(StreamEntry{}.offset, 0U);
-    EXPECT_EQ(StreamEntry{}.end(), 0U);
 }
 
 TEST(StreamEntries, StopsInFrontOfWhatIsCutShortAtEveryByte) {
@@ -95,13 +87,6 @@ TEST(StreamEntries, BelievesNoSizeBeyondTheEnd) {
     }
 }
 
-TEST(StreamEntries, GoesByTheSizeThatAReaderKnows) {
-    StreamEntries entries =
-        entriesOf(streamHeader(s_cursorLocations, 1, 12) + pointEntry(1, 2, 3) + pointEntry(4, 5, 6));
-    entries.setEntrySize(16);
-    EXPECT_EQ(allOf(entries), (std::vector{pointEntry(1, 2, 3), pointEntry(4, 5, 6)}));
-}
-
 TEST(StreamEntries, ReadsEntriesLargerThanItsPieces) {
     const std::string large(200000, 'x');
     StreamEntries entries =
@@ -111,12 +96,9 @@ TEST(StreamEntries, ReadsEntriesLargerThanItsPieces) {
 
 TEST(StreamEntries, GivesFewerBytesWhereTheInputFails) {
     const std::string stream = appNameStream();
-    StreamEntries entries(
-        [&](std::uint64_t position, std::span<char> to) {
-            const std::string held = stream.substr(0, 45); // the length said more
-            return position < held.size() ? held.copy(to.data(), to.size(), static_cast<std::size_t>(position)) : 0;
-        },
-        stream.size());
+    StreamEntries entries(ByteSource(stream.size(), [&](std::uint64_t position, std::span<char> bytes) {
+        return ByteSource::memory(stream).part(0, 45).read(position, bytes); // the size said more
+    }));
     entries.next();
     const auto second = entries.next();
     ASSERT_TRUE(second);

@@ -1,19 +1,15 @@
 // How much of a stream is whole.
 
-#include "ZULMetaData/StreamExtent.h"
+#include "ZULMetaData/StreamEntries.h"
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/ZULMetaData/Containers/ContainerBytes.h"
-#include "ZULMetaData/Containers/RepairPlan.h"
 
 #include <gtest/gtest.h>
 
-#include <array>
 #include <cstddef>
-#include <sstream>
-#include <stdexcept>
+#include <span>
 #include <string>
-#include <system_error>
 #include <vector>
 
 namespace ZULMetaData::Test {
@@ -21,8 +17,7 @@ namespace ZULMetaData::Test {
 namespace {
 
 std::optional<StreamExtent> extentOf(const std::string& stream) {
-    std::istringstream input(stream);
-    return measureStream(input, 0, stream.size());
+    return measureStream(ByteSource::memory(stream));
 }
 
 void expectExtent(const std::string& stream, std::uint64_t wholeBytes, std::uint64_t entries, StreamExtent::End end) {
@@ -95,90 +90,23 @@ TEST(StreamExtent, ReadsStreamsOfAnyLengthInPieces) {
     expectExtent(stream.substr(0, stream.size() - 1), stream.size() - 16, 5001, StreamExtent::InsideEntry);
 }
 
-TEST(StreamExtent, MeasuresAPartOfAnInputThatHasFailed) {
-    std::istringstream input("front" + locationStream() + "behind");
-    input.seekg(1000);
-    input.get();
-    ASSERT_FALSE(input.good());
-    const auto extent = measureStream(input, 5, 50);
+TEST(StreamExtent, MeasuresAPart) {
+    const std::string bytes = "front" + locationStream() + "behind";
+    const auto extent = measureStream(ByteSource::memory(bytes).part(5, 50));
     ASSERT_TRUE(extent);
     EXPECT_EQ(extent->wholeBytes, 40U);
 }
 
-/// Of a device that breaks when it is read (or moved) behind its first bytes.
-class BrokenDevice : public std::stringbuf {
-public:
-    BrokenDevice(const std::string& bytes, bool failsToMove)
-        : std::stringbuf(bytes, std::ios_base::in), failsToMove_(failsToMove) {}
-
-protected:
-    std::streamsize xsgetn(char* bytes, std::streamsize count) override {
-        if (gptr() - eback() >= s_whole)
-            throw std::runtime_error("broken");
-        return std::stringbuf::xsgetn(bytes, count);
-    }
-    pos_type seekpos(pos_type position, std::ios_base::openmode mode) override {
-        return failsToMove_ && position > s_whole ? pos_type(off_type(-1)) : std::stringbuf::seekpos(position, mode);
-    }
-
-private:
-    static constexpr std::ptrdiff_t s_whole = 24;
-    bool failsToMove_;
-};
-
-TEST(StreamExtent, IsNoneOfWhatCannotBeRead) {
-    for (const bool failsToMove : {false, true}) {
-        BrokenDevice device(appNameStream(), failsToMove);
-        std::istream input(&device);
-        const ReadBytes read = readingFrom(input);
-        std::array<char, 8> bytes{};
-        EXPECT_EQ(read(0, bytes), 8U);
-        EXPECT_THROW(read(32, bytes), std::system_error);
-        EXPECT_EQ(read(16, bytes), 8U) << "the next place may be whole";
-    }
-}
-
-TEST(StreamExtent, FindsNothingBehindTheEndOfMemory) {
-    std::istringstream input("12345678");
-    const ReadBytes read = readingFrom(input);
-    std::array<char, 8> bytes{};
-    EXPECT_EQ(read(4, bytes), 4U);
-    EXPECT_EQ(read(8, bytes), 0U);
-    EXPECT_EQ(read(9, bytes), 0U);
-}
-
-TEST(StreamExtent, FindsNothingInMemoryWithoutBytes) {
-    std::istringstream input;
-    const ReadBytes read = readingFrom(input);
-    std::array<char, 8> bytes{};
-    EXPECT_EQ(read(0, bytes), 0U);
-    EXPECT_EQ(read(1, bytes), 0U);
-}
-
-TEST(SizeOfInput, IsThatOfAllBytesWhateverTheState) {
-    std::istringstream input("12345678");
-    input.seekg(3);
-    input.setstate(std::ios_base::eofbit | std::ios_base::failbit);
-    EXPECT_EQ(sizeOfInput(input), 8U);
-    EXPECT_TRUE(input.good());
-}
-
-TEST(SizeOfInput, IsNoNumberWhereItCannotBeTold) {
-    struct WithoutEnd : std::stringbuf {
-        pos_type seekoff(off_type, std::ios_base::seekdir, std::ios_base::openmode) override { return off_type(-1); }
-    } device;
-    std::istream input(&device);
-    EXPECT_THROW(sizeOfInput(input), std::system_error);
-    EXPECT_THROW(planRepair(input), std::system_error);
-}
-
 TEST(StreamExtent, TakesAnInputThatEndsEarlyForTorn) {
-    std::istringstream input(appNameStream());
-    const auto extent = measureStream(input, 0, 1000);
+    const std::string stream = appNameStream();
+    const ByteSource source(1000, [&](std::uint64_t position, std::span<char> bytes) {
+        return ByteSource::memory(stream).read(position, bytes);
+    });
+    const auto extent = measureStream(source);
     ASSERT_TRUE(extent);
     EXPECT_EQ(extent->wholeBytes, 56U);
     EXPECT_EQ(extent->end, StreamExtent::InsideEntry);
-    EXPECT_FALSE(measureStream(input, 40, 1000));
+    EXPECT_FALSE(measureStream(source.part(40)));
 }
 
 } // namespace

@@ -1,4 +1,5 @@
 zulm_add_tests(ZULMetaDataTests
+  ByteSourceTest
   Containers/AtomRepairTest
   Containers/ContainerLayoutTest
   Containers/ContainerRecognitionTest

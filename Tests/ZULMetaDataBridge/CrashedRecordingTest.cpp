@@ -47,8 +47,8 @@ protected:
     void attachSafely(const std::vector<std::string>& files) const {
         std::vector<StreamSource> sources;
         for (const std::string& file : files)
-            sources.push_back(StreamSource::file(file));
-        SafeMovieSave(movie).attach(sources, SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Unchecked);
+            sources.push_back(StreamSource::file(file).unchecked());
+        SafeMovieSave(movie).attach(sources);
     }
 
     /// The entries whose bytes are all there.

@@ -102,7 +102,7 @@ TEST_F(InvalidCorpus, IsSurvivedByWhatLooksIntoContainers) {
         for (const auto& [type, bytes] : streams)
             EXPECT_LE(bytes.size(), std::filesystem::file_size(file.path)) << file.name;
         readRecordingInfo(*parser);
-        listTopLevel(parser->getStream(), parser->getStreamType());
+        topLevelItems(ByteSource::stream(parser->getStream()), parser->getStreamType());
         Util::recordingScaleForMP4AtPath(file.path);
     }
 }

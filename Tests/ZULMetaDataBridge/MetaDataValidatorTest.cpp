@@ -27,8 +27,7 @@ const std::string s_unknown = "12345678";
 const double s_noNumber = std::numeric_limits<double>::quiet_NaN();
 
 ValidationReport validated(const std::string& bytes, MetaDataParser::StreamType type) {
-    std::istringstream stream(bytes);
-    return validateRecording(stream, type);
+    return validateRecording(ByteSource::memory(bytes), type);
 }
 
 /// "code@offset code@offset", in the order of the offsets.
@@ -305,8 +304,8 @@ TEST(MetaDataValidator, NamesEveryCursorWithoutAnImageOnce) {
 
 TEST(MetaDataValidator, LeavesOutWhatItIsToIgnore) {
     std::istringstream stream(locationStream() + "torn");
-    EXPECT_TRUE(validateRecording(stream, s_raw).isDamaged());
-    const ValidationReport report = validateRecording(stream, s_raw, {FindingCode::TornEntry});
+    EXPECT_TRUE(validateRecording(ByteSource::stream(stream), s_raw).isDamaged());
+    const ValidationReport report = validateRecording(ByteSource::stream(stream), s_raw, {FindingCode::TornEntry});
     EXPECT_FALSE(report.isDamaged());
     EXPECT_EQ(findingsOf(report), "");
     EXPECT_EQ(report.wholeEntries, 2U);
@@ -441,7 +440,7 @@ TEST(MetaDataValidator, ReadsNoByteManyTimes) {
     files.emplace_back(extendedAtom("ZULM", tinyAtoms), s_movie);
     for (const auto& [bytes, type] : files) {
         WatchedStream stream(bytes);
-        validateRecording(stream, type);
+        validateRecording(ByteSource::stream(stream), type);
         EXPECT_LE(stream.buffer().bytesRead(), 3 * bytes.size()); // once to find the duration
     }
 }
@@ -500,7 +499,7 @@ TEST(MetaDataValidator, AsksForNoMoreMemoryThanTwiceTheFileAnd16MiB) {
     for (const auto& [bytes, type] : files) {
         std::istringstream stream(bytes);
         const MemoryWatch memory;
-        validateRecording(stream, type);
+        validateRecording(ByteSource::stream(stream), type);
         EXPECT_LE(memory.peak(), 2 * bytes.size() + (std::size_t{16} << 20)) << bytes.size();
     }
 }
@@ -527,7 +526,7 @@ TEST(BelievedSize, IsFoundByValidationInAlmostNoMemory) {
     std::istringstream stream = greedyStream();
     MemoryWatch memory;
     memory.refuseAbove(std::size_t{1} << 20);
-    EXPECT_TRUE(validateRecording(stream, s_raw).isDamaged());
+    EXPECT_TRUE(validateRecording(ByteSource::stream(stream), s_raw).isDamaged());
 }
 
 // ---- what cannot be read ----
@@ -539,7 +538,7 @@ TEST(MetaDataValidator, ThrowsForWhatIsNoFileToRead) {
     for (const char* name : {"Missing.mp4", "Movie.mkv", "Folder.mp4"})
         EXPECT_THROW(validateRecording(folder / name), std::runtime_error) << name;
     std::istringstream stream(media());
-    EXPECT_THROW(validateRecording(stream, MetaDataParser::Unknown), std::runtime_error);
+    EXPECT_THROW(validateRecording(ByteSource::stream(stream), MetaDataParser::Unknown), std::runtime_error);
 }
 
 TEST(MetaDataValidator, TellsWhyAFileCannotBeOpened) {
@@ -561,14 +560,14 @@ TEST(MetaDataValidator, ThrowsWhereTheDeviceFails) {
         int_type underflow() override { return bytesRead() >= 32 ? traits_type::eof() : WatchedBuffer::underflow(); }
     } buffer(locationStream());
     std::istream stream(&buffer);
-    EXPECT_THROW(validateRecording(stream, s_raw), std::runtime_error);
+    EXPECT_THROW(validateRecording(ByteSource::stream(stream), s_raw), std::runtime_error);
 }
 
 TEST(MetaDataValidator, ThrowsForADeviceWithoutPositions) {
     struct PositionlessBuffer final : std::streambuf {
     } buffer;
     std::istream stream(&buffer);
-    EXPECT_THROW(validateRecording(stream, s_raw), std::runtime_error);
+    EXPECT_THROW(validateRecording(ByteSource::stream(stream), s_raw), std::runtime_error);
 }
 
 TEST(MetaDataValidator, TellsTheContainerByTheContentsOfTheFile) {

@@ -8,7 +8,6 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <sstream>
 #include <stdexcept>
 #include <string>
 #include <system_error>
@@ -32,7 +31,7 @@ std::string movie(const std::string& children) {
 class Opened {
 public:
     explicit Opened(const std::string& bytes, const std::string& name = "Recording.mp4")
-        : input_(bytes), recording_(input_, name) {}
+        : bytes_(bytes), recording_(ByteSource::memory(bytes_), name) {}
 
     Recording* operator->() { return &recording_; }
 
@@ -48,7 +47,7 @@ public:
     }
 
 private:
-    std::istringstream input_;
+    std::string bytes_;
     Recording recording_;
 };
 
@@ -187,8 +186,8 @@ TEST(Recording, DeliversWhatReadersDeliverOfEveryDamagedFile) {
                     return true;
                 });
                 if (isDecodable(stream.header()))
-                    MetaDataReader<Value>::parseStream(observed, recording.input(), stream.offset, stream.readableBytes,
-                                                       -1);
+                    MetaDataReader<Value>::parseStream(observed, recording.parser().getStream(), stream.offset,
+                                                       stream.readableBytes, -1);
                 EXPECT_EQ(read, observed.times) << file.name;
             });
     }

@@ -46,6 +46,12 @@ protected:
         return result;
     }
 
+    static std::vector<StreamSource> unchecked(std::vector<StreamSource> sources) {
+        for (StreamSource& source : sources)
+            source = source.unchecked();
+        return sources;
+    }
+
     std::map<uuid, std::string> streamsInMovie() const {
         std::map<uuid, std::string> streams;
         MetaDataParser::create(movie)->loadAllData(streams);
@@ -127,7 +133,7 @@ TEST_F(SafeSave, AttachesStreamsFromMemory) {
 }
 
 TEST_F(SafeSave, ReadsNothingBehindTheEndOfMemory) {
-    const StreamSource::Bytes source = StreamSource::memory("abc", "loaded").open();
+    const ByteSource source = StreamSource::memory("abc", "loaded").open();
     std::string bytes = "....";
     EXPECT_EQ(source.read(1, bytes), 2U);
     EXPECT_EQ(bytes, "bc..");
@@ -171,10 +177,7 @@ TEST_F(SafeSave, NamesAKindThatIsNotRegisteredByItsIdentifier) {
     writeFile(movie, media());
     const std::string bytes = streamHeader("2b7b6aff", 1, 12) + f64(1) + le32(2);
     const auto twice = sources({stream("a.dat", bytes), stream("b.dat", bytes)});
-    EXPECT_THAT(refusal([&] {
-                    SafeMovieSave(movie).attach(twice, SafeMovieSave::Existing::Refuse,
-                                                SafeMovieSave::Sources::Unchecked);
-                }),
+    EXPECT_THAT(refusal([&] { SafeMovieSave(movie).attach(unchecked(twice)); }),
                 HasSubstr("a second stream of the kind 2b7b6aff-7a1f-11e2-83d0-0017f200be7f, beside"));
 }
 
@@ -199,16 +202,16 @@ TEST_F(SafeSave, ChecksWithoutChangingAnything) {
     const std::string before = be32(0) + "mdat" + "0123456789";
     writeFile(movie, before);
     const auto check = [&](const std::vector<StreamSource>& streams) {
-        return refusal([&] { SafeMovieSave(movie).checkAttach(streams); });
+        return refusal([&] { AttachPlan(streams).requireFor(ByteSource::file(movie), movie); });
     };
     const auto locations = sources({stream("a.dat", locationStream())});
-    SafeMovieSave(movie).checkAttach(locations);
+    AttachPlan(locations).requireFor(ByteSource::file(movie), movie);
     EXPECT_THAT(check({}), HasSubstr("no streams to attach"));
     EXPECT_THAT(check(sources({stream("b.dat", "x")})), HasSubstr("too short for a stream"));
     EXPECT_EQ(contentsOf(movie), before);
     writeFile(movie, media() + zulmAtom({locationStream()}));
     EXPECT_THAT(check(locations), HasSubstr("has a stream of the kind cursorLocation already"));
-    SafeMovieSave(movie).checkAttach(locations, SafeMovieSave::Existing::Supersede);
+    AttachPlan(locations, ExistingStreams::Supersede).requireFor(ByteSource::file(movie), movie);
     EXPECT_EQ(contentsOf(movie), media() + zulmAtom({locationStream()}));
 }
 
@@ -256,13 +259,12 @@ TEST_F(SafeSave, RefusesDoubtfulSourcesUnlessTheyAreAskedFor) {
         writeFile(movie, media());
         const auto source = sources({stream("a.dat", bytes)});
         EXPECT_THAT(refusal([&] { SafeMovieSave(movie).attach(source); }), HasSubstr(sentence));
-        EXPECT_THAT(refusal([&] { SafeMovieSave(movie).checkAttach(source); }), HasSubstr(sentence));
         try {
             SafeMovieSave(movie).attach(source);
         } catch (const SaveError& error) {
             EXPECT_EQ(error.reason(), SaveError::Reason::Doubtful);
         }
-        SafeMovieSave(movie).attach(source, SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Unchecked);
+        SafeMovieSave(movie).attach(unchecked(source));
         EXPECT_EQ(streamCount(), 1U);
     }
     for (const std::string& empty : {streamHeader(s_cursorLocations, 1, 16), streamHeader("2b7b6aef", 1, 16)}) {
@@ -285,8 +287,8 @@ TEST_F(SafeSave, CutsHostileStreamsDownToWhatIsWhole) {
         EXPECT_EQ(contentsOf(movie), media() + zulmAtom({bytes.substr(0, 39), locationStream()}));
     }
     writeFile(movie, media());
-    SafeMovieSave(movie).attach(sources({stream("a.dat", streamHeader(s_cursorLocations, 1, 0xffffffff) + "rest")}),
-                                SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Unchecked);
+    SafeMovieSave(movie).attach(
+        unchecked(sources({stream("a.dat", streamHeader(s_cursorLocations, 1, 0xffffffff) + "rest")})));
     EXPECT_EQ(contentsOf(movie), media() + zulmAtom({streamHeader(s_cursorLocations, 1, 0xffffffff)}));
 }
 
@@ -589,8 +591,7 @@ TEST_F(SafeSave, KeepsASizeThatIsNotThereAwayFromReaders) {
     ASSERT_EQ(read.values.size(), 1U);
     EXPECT_EQ(read.values[0].size(), huge - 8) << "the reader believes it";
     writeFile(movie, media());
-    SafeMovieSave(movie).attach({StreamSource::memory(hostile, "hostile")}, SafeMovieSave::Existing::Refuse,
-                                SafeMovieSave::Sources::Unchecked);
+    SafeMovieSave(movie).attach({StreamSource::memory(hostile, "hostile").unchecked()});
     Entries<std::string> attached;
     MetaDataParser::create(movie)->loadDataType<std::string>(kind(s_appNames), attached, -1);
     EXPECT_TRUE(attached.values.empty());
@@ -651,8 +652,7 @@ long peakMemoryInKilobytes() {
 TEST_F(SafeSave, SaysWhereTheIndexOfFragmentsIs) {
     const auto attach = [&](SafeMovieSave::FragmentIndex index) {
         return SafeMovieSave(movie)
-            .attach({StreamSource::memory(locationStream(), "stream")}, SafeMovieSave::Existing::Refuse,
-                    SafeMovieSave::Sources::Checked, index)
+            .attach({StreamSource::memory(locationStream(), "stream")}, SafeMovieSave::Existing::Refuse, index)
             .fragmentIndex;
     };
     writeFile(movie, media());
@@ -669,7 +669,7 @@ TEST_F(SafeSave, MovesTheIndexOfFragmentsToTheEnd) {
     for (const std::string& index : {atom("mfra", "index"), extendedAtom("mfra", std::string(1 << 19, 'i'))}) {
         writeFile(movie, media() + index);
         SafeMovieSave(movie).attach({StreamSource::memory(locationStream(), "stream")}, SafeMovieSave::Existing::Refuse,
-                                    SafeMovieSave::Sources::Checked, SafeMovieSave::FragmentIndex::MoveToEnd);
+                                    SafeMovieSave::FragmentIndex::MoveToEnd);
         std::string blank = index;
         blank.replace(4, 4, "free");
         EXPECT_EQ(contentsOf(movie), media() + blank + zulmAtom({locationStream()}) + index);
@@ -682,7 +682,7 @@ TEST_F(SafeSave, IsWhatItWasWhereverAMoveOfTheIndexFails) {
     for (const std::uint64_t limit : {whole.size() + 10, whole.size() + 100, whole.size() + 2000}) {
         const FileSizeLimit limited(limit);
         EXPECT_THROW(SafeMovieSave(movie).attach({StreamSource::memory(locationStream(), "stream")},
-                                                 SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Checked,
+                                                 SafeMovieSave::Existing::Refuse,
                                                  SafeMovieSave::FragmentIndex::MoveToEnd),
                      SaveError);
         EXPECT_EQ(contentsOf(movie), whole) << limit;

@@ -18,7 +18,7 @@ struct Redacted {
 
 Redacted redacted(const std::string& stream, const Redaction& redaction) {
     std::ostringstream out;
-    const RedactedStream result = redactStream(StreamSource::memory(stream, "test").open(), redaction, out);
+    const RedactedStream result = redactStream(ByteSource::memory(stream), redaction, out);
     return {result, out.str()};
 }
 
@@ -207,7 +207,7 @@ TEST(StreamRedaction, TellsWhatBecomesOfEachEntry) {
 TEST(StreamRedaction, CollectsTheTextsThatGo) {
     RedactedTexts texts;
     const auto collect = [&](const std::string& stream, const Redaction& redaction) {
-        collectRedactedTexts(StreamSource::memory(stream, "test").open(), redaction, texts);
+        collectRedactedTexts(ByteSource::memory(stream), redaction, texts);
     };
     collect(appNameStream(), hiding("ote"));
     collect(names(textEntry(0, "early") + textEntry(1, "") + textEntry(2, "late")), within(2, 3));

@@ -24,7 +24,7 @@ Retimed retimed(const std::string& stream, double shift, std::optional<double> t
     Retiming retiming;
     retiming.shift = shift;
     retiming.trimmedTo = trimmedTo;
-    const RetimedStream result = retimeStream(StreamSource::memory(stream, "stream").open(), retiming, out);
+    const RetimedStream result = retimeStream(ByteSource::memory(stream), retiming, out);
     return {result, out.str()};
 }
 
@@ -115,11 +115,11 @@ TEST(StreamRetiming, RefusesStreamsWhoseTimesNobodyKnows) {
 }
 
 TEST(StreamRetiming, MeasuresTimes) {
-    const auto span = timeSpanOf(StreamSource::memory(locations({3, -1, 8, 9}), "stream").open(), 7);
+    const auto span = timeSpanOf(ByteSource::memory(locations({3, -1, 8, 9})), 7);
     EXPECT_EQ(span.first, -1.0);
     EXPECT_EQ(span.last, 9.0);
     EXPECT_EQ(span.entriesAfter, 2U);
-    EXPECT_EQ(timeSpanOf(StreamSource::memory("short", "stream").open(), 7).last, std::nullopt);
+    EXPECT_EQ(timeSpanOf(ByteSource::memory("short"), 7).last, std::nullopt);
 }
 
 } // namespace

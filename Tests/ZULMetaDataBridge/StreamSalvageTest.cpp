@@ -15,8 +15,7 @@ using Origin = SalvagedStream::Origin;
 
 std::vector<SalvagedStream> salvaged(const std::string& bytes,
                                      MetaDataParser::StreamType type = MetaDataParser::QuickTime) {
-    std::istringstream file(bytes);
-    return StreamSalvage(file, type).run().streams;
+    return StreamSalvage(ByteSource::memory(bytes), type).run().streams;
 }
 
 std::string bytesOf(const std::string& file, const SalvagedStream& stream) {
@@ -90,7 +89,7 @@ TEST(StreamSalvage, EndsWhereTheDeviceFails) {
         std::streamsize xsgetn(char*, std::streamsize) override { return 0; }
     } buffer(media() + zulmAtom({locationStream()}));
     std::istream file(&buffer);
-    EXPECT_TRUE(StreamSalvage(file, MetaDataParser::RawStream).run().streams.empty());
+    EXPECT_TRUE(StreamSalvage(ByteSource::stream(file), MetaDataParser::RawStream).run().streams.empty());
 }
 
 TEST(StreamSalvage, CannotSearchAFileWhoseSizeCannotBeTold) {
@@ -99,7 +98,7 @@ TEST(StreamSalvage, CannotSearchAFileWhoseSizeCannotBeTold) {
         pos_type seekoff(off_type, std::ios_base::seekdir, std::ios_base::openmode) override { return off_type(-1); }
     } buffer(media() + zulmAtom({locationStream()}));
     std::istream file(&buffer);
-    EXPECT_THROW(StreamSalvage(file, MetaDataParser::QuickTime), std::system_error);
+    EXPECT_THROW(StreamSalvage(ByteSource::stream(file), MetaDataParser::QuickTime), std::system_error);
 }
 
 TEST(StreamSalvage, CannotSearchAFileThatCannotBeRead) {
@@ -108,7 +107,7 @@ TEST(StreamSalvage, CannotSearchAFileThatCannotBeRead) {
         std::streamsize xsgetn(char*, std::streamsize) override { throw std::ios_base::failure("cannot be read"); }
     } buffer(media() + zulmAtom({locationStream()}));
     std::istream file(&buffer);
-    EXPECT_THROW(StreamSalvage(file, MetaDataParser::QuickTime).run(), std::system_error);
+    EXPECT_THROW(StreamSalvage(ByteSource::stream(file), MetaDataParser::QuickTime).run(), std::system_error);
 }
 
 TEST(StreamSalvage, FindsStreamsBehindADataAtomThatCountsATornTail) {
@@ -283,8 +282,7 @@ TEST(StreamSalvage, StopsCountingInAFileFullOfHeaders) {
     const std::string stream = streamHeader(s_cursorLocations, 1, 16) + pointEntry(1, 2, 3);
     for (std::size_t i = 0; i <= SalvageReport::s_maximumStreams; ++i)
         file += stream;
-    std::istringstream input(file);
-    const SalvageReport report = StreamSalvage(input, MetaDataParser::Unknown).run();
+    const SalvageReport report = StreamSalvage(ByteSource::memory(file), MetaDataParser::Unknown).run();
     EXPECT_EQ(report.streams.size(), SalvageReport::s_maximumStreams);
     EXPECT_TRUE(report.hasMore);
 }
@@ -305,7 +303,7 @@ TEST(StreamSalvage, SurvivesEveryHostileSize) {
 TEST(StreamSalvage, TellsHowFarItIs) {
     std::istringstream file(media() + zulmAtom({locationStream()}));
     std::uint64_t last = 0;
-    StreamSalvage(file, MetaDataParser::QuickTime, [&](std::uint64_t done) { last = done; }).run();
+    StreamSalvage(ByteSource::stream(file), MetaDataParser::QuickTime, [&](std::uint64_t done) { last = done; }).run();
     EXPECT_EQ(last, file.str().size());
 }
 

@@ -6,6 +6,7 @@ zulm_add_tests(ZULMetaDataBridgeTests
   EntryTextsTest
   HumanReadableActionsTest
   InvalidCorpusTest
+  KeyCaptionsTest
   KeyNamesTest
   KindsTest
   MediaFilesTest

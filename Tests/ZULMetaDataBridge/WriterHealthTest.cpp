@@ -142,7 +142,7 @@ TYPED_TEST(WriterHealth, IsBadAfterATimeThatIsNotFinite) {
         EXPECT_FALSE(writer.isHealthy());
         EXPECT_EQ(writer.entriesWritten(), 2U); // both are in the file
         finish(writer);
-        const auto extent = measureStream(StreamSource::file(this->file).open().read, contentsOf(this->file).size());
+        const auto extent = measureStream(ByteSource::file(this->file));
         EXPECT_EQ(extent->entries, 2U);
         writer.setup();
         EXPECT_TRUE(writer.isHealthy());

@@ -23,7 +23,7 @@ struct AtomsOptions {
 };
 
 Json itemDocument(const LayoutItem& entry) {
-    Json document{{"type", printable(entry.item.type)},
+    Json document{{"type", printable(entry.item.type.text())},
                   {"offset", entry.item.offset},
                   {"size", entry.size},
                   {"header", entry.headerForm()},
@@ -65,7 +65,7 @@ std::string remarkOn(const LayoutItem& entry) {
 }
 
 void printItem(const LayoutItem& entry, bool isChild) {
-    const std::string type = (isChild ? "  " : "") + printable(entry.item.type);
+    const std::string type = (isChild ? "  " : "") + printable(entry.item.type.text());
     std::string line = fmt::format("  {:<12}  {:>16}  {:>16}  {:<10}  {}", type, entry.item.offset, entry.size,
                                    entry.headerForm(), remarkOn(entry));
     line.erase(line.find_last_not_of(' ') + 1);

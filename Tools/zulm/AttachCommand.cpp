@@ -14,7 +14,6 @@
 
 #include <algorithm>
 #include <filesystem>
-#include <fstream>
 #include <set>
 
 namespace Zulm {
@@ -40,17 +39,16 @@ struct AttachOptions {
 
 /// What is to be attached, and whether something of it is lost already.
 struct Streams {
-    std::vector<StreamSource> sources;
-    std::vector<StreamSource> files; ///< those of the sources that are stream files
-    std::vector<std::string> empty;  ///< stream files that were left out
-    std::set<uuid> types;            ///< of the stream files
+    std::vector<StreamSource> sources; ///< only stream files are checked
+    std::vector<std::string> empty;    ///< stream files that were left out
+    std::set<uuid> types;              ///< of the stream files
     ExitCode code = ExitFine;
 };
 
 uuid typeOfStreamFile(const std::string& path) {
     requireFile(path);
-    std::ifstream file = openInput(path);
-    const RecognizedContainer recognized = orFileError(path, [&] { return recognizeContainer(file, path); });
+    const RecognizedContainer recognized =
+        orFileError(path, [&path] { return recognizeContainer(ByteSource::file(path), path); });
     if (recognized.type == Container::RawStream)
         return openRecording(path).streams().front().type;
     if (recognized.type == Container::Unknown)
@@ -70,8 +68,8 @@ void takeStreamFiles(const AttachOptions& options, Streams& streams) {
             continue;
         }
         streams.types.insert(type);
-        streams.sources.push_back(StreamSource::file(path));
-        streams.files.push_back(streams.sources.back());
+        const StreamSource source = StreamSource::file(path);
+        streams.sources.push_back(options.unchecked ? source.unchecked() : source);
     }
 }
 
@@ -81,26 +79,23 @@ void complainAboutOldMovie(const std::string& path, const std::string& what, Str
 }
 
 /// Where the children of a metadata atom or chunk do not end where it does, not all of them were found.
-bool hasUnreachableStreams(Recording& recording) {
-    std::istream& stream = recording.input();
-    const Container::Type container = recording.container();
-    const bool isMovie = container == Container::QuickTime;
-    const std::uint64_t total = recording.size();
-    for (const ContainerItem& item : listTopLevel(stream, container)) {
-        if (!item.holdsMetaData())
+bool hasUnreachableStreams(const Recording& recording) {
+    ItemWalk items(recording.bytes(), recording.container());
+    while (const auto item = items.next()) {
+        if (!item->holdsMetaData())
             continue;
-        const auto children = (isMovie ? listAtoms : listChunks)(stream, item.payloadOffset(), item.end(), total);
-        std::uint64_t end = children.empty() ? item.payloadOffset() : children.back().end();
-        if (!isMovie && !children.empty())
-            end += children.back().size % 2;
-        if (end != item.end())
+        std::uint64_t end = item->payloadOffset();
+        ItemWalk children = items.inside(*item);
+        while (const auto child = children.next())
+            end = children.after(*child);
+        if (end != item->end())
             return true;
     }
     return false;
 }
 
 void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
-    Recording old = openRecording(options.from);
+    const Recording old = openRecording(options.from);
     for (const StreamInfo& stream : old.streams()) {
         if (options.replace && streams.types.contains(stream.type))
             continue; // a stream file takes its place
@@ -114,7 +109,7 @@ void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
                                   fmt::format("{} declares {} bytes, {} of which are there", place,
                                               stream.declaredBytes, stream.presentBytes),
                                   streams);
-        streams.sources.push_back(StreamSource::part(options.from, stream.offset, stream.declaredBytes));
+        streams.sources.push_back(StreamSource::part(options.from, stream.offset, stream.declaredBytes).unchecked());
     }
     if (hasUnreachableStreams(old))
         complainAboutOldMovie(options.from, "its metadata cannot be walked to the end", streams);
@@ -209,18 +204,18 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     const RetimedSources retimed(streams.sources, options.times, duration, folder);
     if (retimed.sources().empty())
         return complainAboutNoStreams(options, ExitDamaged);
-    const auto existing = options.replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse;
-    using Sources = SafeMovieSave::Sources;
+    const auto existing = options.replace ? ExistingStreams::Supersede : ExistingStreams::Refuse;
     const auto index =
         options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd : SafeMovieSave::FragmentIndex::Leave;
-    movie.examine([&](const SafeMovieSave& save) {
-        if (!streams.files.empty() && !options.unchecked)
-            save.checkAttach(streams.files, existing);
-        save.checkAttach(retimed.sources(), existing, Sources::Unchecked);
+    const AttachPlan plan = movie.examine([&](const std::string& path) {
+        AttachPlan examined(streams.sources, existing);
+        if (options.times.changesTimes())
+            examined = AttachPlan(retimed.sources(), existing);
+        orFileError(path, [&] { examined.requireFor(ByteSource::file(path), path); });
+        return examined;
     });
-    const AttachResult attached = movie.save("attaching to " + movie.name(), [&](const SafeMovieSave& save) {
-        return save.attach(retimed.sources(), existing, Sources::Unchecked, index);
-    });
+    const AttachResult attached =
+        movie.save("attaching to " + movie.name(), [&](const SafeMovieSave& save) { return save.attach(plan, index); });
     const TimesOutside times{warnOfTimesOutside(movie.name(), duration, retimed.sources()), retimed.entriesRemoved()};
     if (report.isWanted())
         report.add(fileDocument(options, movie.name(), attached, times, streams));

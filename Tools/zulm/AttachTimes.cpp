@@ -64,6 +64,7 @@ RetimedSources::RetimedSources(const std::vector<StreamSource>& originals, const
             sources_.push_back(original); // refused in the words of everyone who attaches it
             continue;
         }
+        output.flush(); // so that the copy can be opened
         entriesRemoved_ += stream->entriesRemoved;
         if (stream->bytesLeftOut > 0)
             cuts_.push_back(fmt::format("{}: {} left out {} bytes after its last whole entry", original.name(),
@@ -72,7 +73,8 @@ RetimedSources::RetimedSources(const std::vector<StreamSource>& originals, const
             warn(fmt::format("{}: no entry of {} lies in the movie; the stream is left out", original.name(),
                              metaDataKindName(stream->header.uuid)));
         else
-            sources_.push_back(StreamSource::part(file_->path(), begin, size).named(original.name()));
+            sources_.push_back(
+                StreamSource::bytes(ByteSource::file(file_->path()).part(begin, size), original.name()).unchecked());
     }
     output.close();
     if (!output)
@@ -88,12 +90,7 @@ ExitCode RetimedSources::complainAboutCuts() const {
 }
 
 std::optional<double> durationOfMovie(const std::string& path) {
-    std::ifstream movie = openInput(path);
-    return orFileError(path, [&movie] {
-        const auto duration = movieDuration(movie, Container::QuickTime);
-        requireReadable(movie);
-        return duration;
-    });
+    return orFileError(path, [&path] { return movieDuration(ByteSource::file(path), Container::QuickTime); });
 }
 
 std::uint64_t warnOfTimesOutside(const std::string& name, std::optional<double> duration,

@@ -5,6 +5,7 @@
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "ZULMetaDataBridge/Source/KeyCaptions.h"
 
 #include <fmt/core.h>
 
@@ -29,8 +30,7 @@ struct ConvertOptions {
     bool force = false;
 };
 
-constexpr double s_usualPause = 1; // all in seconds
-constexpr double s_shortestPause = 0.001;
+constexpr double s_shortestPause = 0.001; // all in seconds
 constexpr double s_longestPause = 3600;
 constexpr double s_untilTheNext = std::numeric_limits<double>::infinity();
 
@@ -53,8 +53,9 @@ private:
         if constexpr (std::same_as<typename Kind::Value, KeyStroke>) {
             std::vector<KeyEvent> keys;
             walk<KeyStroke>(stream, [&](double time, const KeyStroke& key) { keys.push_back({time, key}); });
-            const auto found = keyCaptions(std::move(keys), options_.pause.value_or(s_usualPause), options_.showsKeys);
-            captions_.insert(captions_.end(), found.begin(), found.end());
+            const double pause = options_.pause.value_or(s_captionPause);
+            for (const KeyCaption& caption : keyCaptions(std::move(keys), options_.showsKeys, pause))
+                captions_.push_back({caption.start, caption.end, caption.text});
         } else if constexpr (std::same_as<typename Kind::Value, std::string>) {
             std::string last = "\n"; // no title is like it
             walk<std::string>(stream, [&](double time, const std::string& stored) {
@@ -185,7 +186,7 @@ void addConvertCommand(CLI::App& app, Action& chosen) {
     command->callback([options, &chosen] {
         requireKinds("--stream", options->kinds, "has neither keystrokes nor texts",
                      []<class Kind>() { return OneOf<typename Kind::Value, std::string, KeyStroke>; });
-        requirePauseInRange(options->pause.value_or(s_usualPause));
+        requirePauseInRange(options->pause.value_or(s_captionPause));
         chosen = [options] { return runConvert(*options); };
     });
 }

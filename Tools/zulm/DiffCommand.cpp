@@ -113,18 +113,14 @@ private:
     std::uint64_t end_ = 0;
 };
 
-bool haveSameBytes(Recording& left, const StreamInfo& leftStream, Recording& right, const StreamInfo& rightStream) {
-    if (leftStream.presentBytes != rightStream.presentBytes || leftStream.declaredBytes != rightStream.declaredBytes)
+bool haveSameBytes(const ByteSource& left, const ByteSource& right) {
+    if (left.size() != right.size())
         return false;
     std::vector<char> leftPiece(1 << 18);
     std::vector<char> rightPiece(leftPiece.size());
-    const ReadBytes readLeft = left.bytes();
-    const ReadBytes readRight = right.bytes();
-    for (std::uint64_t done = 0; done < leftStream.presentBytes;) {
-        const auto wanted =
-            static_cast<std::size_t>(std::min<std::uint64_t>(leftPiece.size(), leftStream.presentBytes - done));
-        const std::size_t size = readLeft(leftStream.offset + done, {leftPiece.data(), wanted});
-        if (size == 0 || readRight(rightStream.offset + done, {rightPiece.data(), size}) != size ||
+    for (std::uint64_t done = 0; done < left.size();) {
+        const std::size_t size = left.read(done, leftPiece);
+        if (size == 0 || right.read(done, {rightPiece.data(), size}) != size ||
             !std::equal(leftPiece.begin(), leftPiece.begin() + static_cast<std::ptrdiff_t>(size), rightPiece.begin()))
             return false;
         done += size;
@@ -299,7 +295,8 @@ private:
     }
 
     void compare(const StreamInfo& leftStream, const StreamInfo& rightStream) {
-        if (!haveSameBytes(left_, leftStream, right_, rightStream))
+        if (leftStream.declaredBytes != rightStream.declaredBytes ||
+            !haveSameBytes(left_.bytesOf(leftStream), right_.bytesOf(rightStream)))
             compareEntries(leftStream, rightStream);
         else if (writer_)
             writer_->element(streamDocument(leftStream, "same"));

@@ -47,12 +47,13 @@ public:
     EntryPrinter(const DumpOptions& options, Recording& recording, Printout& printout, const StreamReport& stream)
         : options_(options), recording_(recording), printout_(printout), stream_(stream) {
         if (!isTerminal(stdout))
-            progress_.emplace("reading " + stream.name(), stream.declaredBytes);
+            progress_.emplace("reading " + stream.name(), stream.readableBytes);
     }
 
     void print(double time, const typename Kind::Value& value) {
         ++read_;
-        showProgress();
+        if (progress_ && read_ % 1024 == 0)
+            progress_->moveTo(stream_.readableBytes * read_ / std::max(read_, stream_.wholeEntries));
         if (!options_.covers(time))
             return;
         Json entry = entryDocument<Kind>(time, value);
@@ -66,15 +67,6 @@ public:
     std::uint64_t read() const { return read_; }
 
 private:
-    /// Asking a file for its position costs a call of the system.
-    void showProgress() {
-        constexpr std::uint64_t interval = 1024;
-        if (!progress_ || read_ % interval != 0)
-            return;
-        const auto position = static_cast<std::uint64_t>(recording_.input().tellg());
-        progress_->moveTo(std::min(position - stream_.offset, stream_.declaredBytes));
-    }
-
     void writeImage(Json& entry, const CursorImage& cursor) const {
         if (options_.imageFolder.empty() || !entry["image"].is_object() || !damageOf(entry).empty())
             return;

@@ -63,7 +63,7 @@ void print(Recording& recording, const FileInfo& file) {
     for (const ZCAPHeader& info : file.creators)
         writeOutput(creatorLine(info.creator));
     visitForeignAtoms(recording, [](const LayoutItem& atom) {
-        writeOutput(fmt::format("  foreign atom: '{}' at offset {}, {} bytes\n", printable(atom.item.type),
+        writeOutput(fmt::format("  foreign atom: '{}' at offset {}, {} bytes\n", printable(atom.item.type.text()),
                                 atom.item.offset, atom.size));
     });
 }

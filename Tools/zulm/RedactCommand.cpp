@@ -200,7 +200,8 @@ ExitCode preview(const RedactOptions& options, Recording& recording, RunReport& 
             visit(entry);
     };
     return orFailure(options, name, [&] {
-        RecordingRedactor redactor(recording.input(), recording.container(), redaction, progressOf(options, name));
+        RecordingRedactor redactor(recording.parser().getStream(), recording.container(), redaction,
+                                   progressOf(options, name));
         if (redactor.isEmpty())
             return complainAboutNothing(recording, {});
         const RedactedRecording result = redactor.preview();
@@ -216,7 +217,7 @@ ExitCode preview(const RedactOptions& options, Recording& recording, RunReport& 
 ExitCode write(const RedactOptions& options, Recording& recording, RunReport& report) {
     const std::string& name = recording.name();
     return orFailure(options, name, [&] {
-        RecordingRedactor redactor(recording.input(), recording.container(), redactionFor(options),
+        RecordingRedactor redactor(recording.parser().getStream(), recording.container(), redactionFor(options),
                                    progressOf(options, name));
         if (redactor.isEmpty())
             return complainAboutNothing(recording, {});

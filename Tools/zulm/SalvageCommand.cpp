@@ -12,8 +12,6 @@
 
 #include <fmt/core.h>
 
-#include <filesystem>
-#include <fstream>
 #include <memory>
 
 namespace Zulm {
@@ -39,9 +37,9 @@ const char* originText(SalvagedStream::Origin origin) {
 }
 
 SalvageReport search(const std::string& path) {
-    std::ifstream file = openInput(path);
-    Progress progress("searching " + path, std::filesystem::file_size(path));
-    return orFileError(path, [&] {
+    return orFileError(path, [&path] {
+        const ByteSource file = ByteSource::file(path);
+        Progress progress("searching " + path, file.size());
         const Container::Type type = recognizeContainer(file, path).type; // unknown ones are searched, too
         return StreamSalvage(file, type, [&](std::uint64_t done) { progress.moveTo(done); }).run();
     });

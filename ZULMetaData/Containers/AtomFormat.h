@@ -2,10 +2,11 @@
 
 // The bytes of movie atoms and RIFF chunks, in one place.
 //
-//     atom   [size: 4][type: 4][extended size: 8, where size is below 8][payload]     big-endian, size counts it all
-//     chunk  [type: 4][size: 4][data][one byte where size is odd]                     little-endian, size counts data
+//     atom   [size: 4][type: 4][extended size: 8, if size is below 8][payload]        big-endian, size counts it all
+//     chunk  [type: 4][size: 4][data][one byte if size is odd]                        little-endian, size counts data
 
 #include "SharedDependencies/EndianFile.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 
 #include <array>
 #include <cstdint>
@@ -13,36 +14,56 @@
 
 namespace ZULMetaData::detail {
 
-/// A four-character code as a movie's 32-bit number.
-constexpr std::uint32_t fourCC(const char (&code)[5]) {
-    std::uint32_t value = 0;
-    for (int i = 0; i < 4; ++i)
-        value = value << 8 | static_cast<unsigned char>(code[i]);
-    return value;
-}
-
-inline constexpr std::uint32_t s_metaDataAtom = fourCC("ZULM");
-inline constexpr std::uint32_t s_streamAtom = fourCC("DATA");
-inline constexpr std::uint32_t s_recordingInfoAtom = fourCC("ZULR");
-inline constexpr std::uint32_t s_spareAtom = fourCC("wide");
-inline constexpr std::uint32_t s_freeAtom = fourCC("free");
-inline constexpr std::uint32_t s_fragmentIndexAtom = fourCC("mfra");
-
-/// A chunk whose data nobody reads.
-inline constexpr std::uint32_t s_junkChunk = fourCC("JUNK");
-
-/// Chunk types are compared as they are stored.
-constexpr std::uint32_t chunkType(std::uint32_t code) {
-    return swapInt(code);
-}
+inline constexpr FourCC s_spareAtom = "wide";
+inline constexpr FourCC s_freeAtom = "free";
+inline constexpr FourCC s_fragmentIndexAtom = "mfra";
+inline constexpr FourCC s_junkChunk = "JUNK"; // a chunk whose data no program reads
 
 inline constexpr std::uint64_t s_atomHeaderSize = 8;
 inline constexpr std::uint64_t s_extendedAtomHeaderSize = 16;
 inline constexpr std::uint64_t s_extendedSizeOffset = 8;
 inline constexpr std::uint64_t s_chunkHeaderSize = 8;
 
-/// In place of the size: it follows the type, in 64 bits.
+/// Replaces the size if the size follows the type in 64 bits.
 inline constexpr std::uint32_t s_extendedSizeMarker = 1;
+
+/// Which 32-bit sizes announce a size of 64 bits. The search for metadata and the repair disagree about 0 and 2 to 7.
+enum class ExtendedSizes {
+    BelowHeader, ///< every size below 8
+    Marked,      ///< 1 alone; the others are taken literally
+};
+
+/// Reads the header of an atom at the position of `input`. Returns false if its bytes do not exist; for the size 0,
+/// which may be an open end, the 64-bit size need not exist. This is the only function that reads a header of an atom.
+template <class Input>
+bool readAtomHeader(Input& input, ExtendedSizes sizes, ContainerItem& atom) {
+    atom.offset = input.position();
+    atom.headerSize = s_atomHeaderSize;
+    if (!input.enoughBytesLeft(s_atomHeaderSize) || !input.readBigEndian(atom.sizeField) ||
+        !input.readBigEndian(atom.type.value))
+        return false;
+    atom.size = atom.sizeField;
+    const bool isExtended =
+        sizes == ExtendedSizes::Marked ? atom.sizeField == s_extendedSizeMarker : atom.sizeField < s_atomHeaderSize;
+    if (!isExtended)
+        return true;
+    if (!input.readBigEndian(atom.size))
+        return atom.sizeField == 0;
+    atom.headerSize = s_extendedAtomHeaderSize;
+    return true;
+}
+
+/// Reads the header of a chunk at the position of `input`.
+template <class Input>
+bool readChunkHeader(Input& input, ContainerItem& chunk) {
+    chunk.offset = input.position();
+    chunk.headerSize = s_chunkHeaderSize;
+    if (!input.readBigEndian(chunk.type.value) || !input.readBigEndian(chunk.sizeField))
+        return false;
+    chunk.sizeField = swapInt(chunk.sizeField);
+    chunk.size = s_chunkHeaderSize + chunk.sizeField;
+    return true;
+}
 
 template <class Integer>
 std::array<char, sizeof(Integer)> bigEndianBytes(Integer value) {
@@ -52,9 +73,9 @@ std::array<char, sizeof(Integer)> bigEndianBytes(Integer value) {
     return bytes;
 }
 
-/// The header in extended form.
-inline std::array<char, s_extendedAtomHeaderSize> extendedAtomHeader(std::uint32_t type, std::uint64_t size) {
-    const std::array<std::uint32_t, 2> sizeAndType{swapInt(s_extendedSizeMarker), swapInt(type)};
+/// Returns the header in extended form.
+inline std::array<char, s_extendedAtomHeaderSize> extendedAtomHeader(FourCC type, std::uint64_t size) {
+    const std::array<std::uint32_t, 2> sizeAndType{swapInt(s_extendedSizeMarker), swapInt(type.value)};
     const std::uint64_t extendedSize = swapInt(size);
     std::array<char, s_extendedAtomHeaderSize> bytes;
     std::memcpy(bytes.data(), sizeAndType.data(), sizeof sizeAndType);
@@ -62,17 +83,17 @@ inline std::array<char, s_extendedAtomHeaderSize> extendedAtomHeader(std::uint32
     return bytes;
 }
 
-/// The header in its short form.
-inline std::array<char, s_atomHeaderSize> atomHeader(std::uint32_t type, std::uint32_t size) {
-    const std::array<std::uint32_t, 2> sizeAndType{swapInt(size), swapInt(type)};
+/// Returns the header in its short form.
+inline std::array<char, s_atomHeaderSize> atomHeader(FourCC type, std::uint32_t size) {
+    const std::array<std::uint32_t, 2> sizeAndType{swapInt(size), swapInt(type.value)};
     std::array<char, s_atomHeaderSize> bytes;
     std::memcpy(bytes.data(), sizeAndType.data(), sizeof sizeAndType);
     return bytes;
 }
 
-/// `size` counts the data alone.
-inline std::array<char, s_chunkHeaderSize> chunkHeader(std::uint32_t type, std::uint32_t size) {
-    const std::array<std::uint32_t, 2> typeAndSize{chunkType(type), size};
+/// Returns the header of a chunk. `size` counts the data alone.
+inline std::array<char, s_chunkHeaderSize> chunkHeader(FourCC type, std::uint32_t size) {
+    const std::array<std::uint32_t, 2> typeAndSize{swapInt(type.value), size};
     std::array<char, s_chunkHeaderSize> bytes;
     std::memcpy(bytes.data(), typeAndSize.data(), sizeof typeAndSize);
     return bytes;

@@ -11,7 +11,7 @@ constexpr std::uint64_t s_pageSize = 4096;
 
 } // namespace
 
-OpenAtom beginAtom(std::ofstream& movie, std::uint32_t type) {
+OpenAtom beginAtom(std::ofstream& movie, FourCC type) {
     movie.seekp(0, std::ios_base::end);
     const std::int64_t start = toInt64(movie.tellp());
     const auto header = extendedAtomHeader(type, 0);

@@ -4,6 +4,7 @@
 // always in extended form.
 
 #include "SharedDependencies/Export.h"
+#include "ZULMetaData/Containers/FourCC.h"
 
 #include <cstdint>
 #include <fstream>
@@ -17,7 +18,7 @@ struct OpenAtom {
 };
 
 /// Writes the header at the end of `movie`.
-ZULMETADATA_API OpenAtom beginAtom(std::ofstream& movie, std::uint32_t type);
+ZULMETADATA_API OpenAtom beginAtom(std::ofstream& movie, FourCC type);
 
 /// Closes `movie` and gives the length of the atom, counted from an end of -1 where a write has failed.
 ZULMETADATA_API std::uint64_t endAtom(std::ofstream& movie, const OpenAtom& atom);

@@ -1,75 +1,117 @@
 #pragma once
 
-// The atoms of a movie or the chunks of a RIFF file as their headers declare them, for tools that show or check a
-// container. Nothing between the headers is read.
+// The atoms of a movie or the chunks of a RIFF file as their headers declare them. Nothing between the headers is read.
+//
+//     ItemWalk atoms(ByteSource::file("Recording.mp4"), Container::QuickTime);
+//     while (const auto atom = atoms.next())
+//         std::cout << atom->offset << ' ' << atom->type.text() << '\n';
 
-#include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
+#include "../ByteSource.h"
 #include "ContainerType.h"
+#include "FourCC.h"
 
 #include <cstdint>
-#include <istream>
-#include <string>
+#include <memory>
+#include <optional>
 #include <vector>
 
 namespace ZULMetaData {
 
-/// An atom of a movie or a chunk of a RIFF file, by what its header says.
-struct ZULMETADATA_API ContainerItem {
-    std::string type;         ///< four characters as they are stored, whatever bytes they are
-    std::uint64_t offset;     ///< where the header begins
-    std::uint64_t headerSize; ///< 8, or 16 for an atom in extended form
-    std::uint64_t size;       ///< of the whole item, header included, pad byte excluded. As declared: 0 is an open end
+namespace detail {
 
-    /// The 32-bit number in the header. 0 in an atom that others take to reach to the end of the file; the search for
-    /// metadata reads a 64-bit size behind every number below 8, which is then `size`.
+inline constexpr FourCC s_metaDataAtom = "ZULM";
+inline constexpr FourCC s_streamAtom = "DATA";
+inline constexpr FourCC s_recordingInfoAtom = "ZULR";
+
+class ByteReader;
+enum class ExtendedSizes;
+
+} // namespace detail
+
+/// An atom of a movie or a chunk of a RIFF file, as its header describes it.
+struct ContainerItem {
+    FourCC type;
+    std::uint64_t offset = 0;     ///< the position of the header in the file
+    std::uint64_t headerSize = 0; ///< 8, or 16 for an atom in extended form
+
+    /// The size of the whole item, with its header and without its pad byte, as the header declares it.
+    std::uint64_t size = 0;
+
+    /// The 32-bit number in the header. It is 0 in an atom that players take to reach to the end of the file. The
+    /// search for metadata reads a 64-bit size after every number below 8; `size` is then that size.
     std::uint32_t sizeField = 0;
 
-    /// Who tells the size, if the header does not.
+    /// What declares the size, if the header does not.
     enum SizeSource : std::int32_t {
         Header,
-        SizeChunk, ///< the `ds64` chunk inside of an `RF64` or `BW64` chunk
-        FileEnd,   ///< the end of the file or the metadata at it: the RIFF file was written to a pipe
+        SizeChunk, ///< the `ds64` chunk inside an `RF64` or `BW64` chunk
+        FileEnd,   ///< the end of the file or the metadata at its end: the RIFF file was written to a pipe
     };
     SizeSource sizeSource = Header; ///< `Header` for every atom
 
-    bool isExtended() const;    ///< its size stands in 64 bits behind its type
-    bool holdsMetaData() const; ///< by its type; at the top of a container it is the one whose children are streams
-    bool holdsStream() const;   ///< by its type
-    bool holdsRecordingInfo() const; ///< by its type; at the top of a movie
+    bool isExtended() const { return headerSize == 16; } ///< returns whether the size is stored in 64 bits
 
-    std::uint64_t payloadOffset() const { return offset + headerSize; } ///< in the file
+    /// These go by the type alone. At the top of a container, the children of an item with metadata are streams.
+    ///@{
+    bool holdsMetaData() const { return type == detail::s_metaDataAtom; }
+    bool holdsStream() const { return type == detail::s_streamAtom; }
+    bool holdsRecordingInfo() const { return type == detail::s_recordingInfoAtom; }
+    ///@}
 
-    /// Where the next item begins, but for a pad byte. Means nothing where the size is 0 or overflows.
+    std::uint64_t payloadOffset() const { return offset + headerSize; } ///< returns a position in the file
+
+    /// Returns where the next item begins, except for a pad byte. Has no meaning if the size is 0 or overflows.
     std::uint64_t end() const { return offset + size; }
 
-    /// Of the payload, 0 where the declared size does not even cover the header.
+    /// Returns 0 if the declared size does not even cover the header.
     std::uint64_t payloadSize() const { return size < headerSize ? 0 : size - headerSize; }
+
+    /// Returns whether the whole item lies before `limit`.
+    bool fits(std::uint64_t limit) const { return offset <= limit && size <= limit - offset; }
 };
 
-/// Gets one item after the other and ends the walk by false. The stream stands anywhere meanwhile and must be left
-/// there.
-using ContainerVisitor = Callback<bool(const ContainerItem&)>;
+/// Walks over the items of a container, or over the children of one of them. This is the only walk over the items of
+/// files that are not trusted; the search for metadata of `MetaDataParser` and `Util::finalizeAtomsInFile` have loops
+/// of their own, because what they do with a malformed file never changes.
+class ZULMETADATA_API ItemWalk {
+public:
+    /// Begins at the first item. There are no items in a bare stream or a file of unknown type.
+    ItemWalk(ByteSource file, Container::Type type);
 
-/// The items between `begin` and `end` of `stream`, which holds `total` bytes. Ends with the first item that nothing
-/// can follow: one with an open end, one whose end no file position can hold, or one that reaches beyond the total.
-/// All of these clear the stream's state first.
-///@{
-ZULMETADATA_API void visitAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
-                                const ContainerVisitor& visit);
-ZULMETADATA_API void visitChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end, std::uint64_t total,
-                                 const ContainerVisitor& visit);
-ZULMETADATA_API std::vector<ContainerItem> listAtoms(std::istream& stream, std::uint64_t begin, std::uint64_t end,
-                                                     std::uint64_t total);
-ZULMETADATA_API std::vector<ContainerItem> listChunks(std::istream& stream, std::uint64_t begin, std::uint64_t end,
-                                                      std::uint64_t total);
-///@}
+    /// Returns the next item, or nothing after an item that nothing can follow: one whose declared end is not after its
+    /// beginning, or lies beyond the file. Throws `std::system_error` if reading fails.
+    std::optional<ContainerItem> next();
 
-/// The items at the top of a container; none where `type` is a bare stream or unknown. A movie may hold hundreds of
-/// thousands: visiting them keeps none.
-///@{
-ZULMETADATA_API void visitTopLevel(std::istream& stream, Container::Type type, const ContainerVisitor& visit);
-ZULMETADATA_API std::vector<ContainerItem> listTopLevel(std::istream& stream, Container::Type type);
-///@}
+    /// Returns a walk over the children of an item, which ends with the item.
+    ItemWalk inside(const ContainerItem& parent) const;
+
+    /// Returns the item whose header is at `position`. Empty if the header does not end before the walk does.
+    std::optional<ContainerItem> itemAt(std::uint64_t position) const;
+
+    void moveTo(std::uint64_t position) { position_ = position; }  ///< the next item is read there
+    std::uint64_t position() const { return position_; }           ///< returns where the next item is read
+    std::uint64_t end() const { return end_; }                     ///< returns where the walk ends at the latest
+    bool isMovie() const { return type_ == Container::QuickTime; } ///< returns whether the items are atoms
+    const ByteSource& source() const;                              ///< returns the file
+    detail::ByteReader& reader() const { return *reader_; }        ///< is for the library itself
+
+    /// Returns where the item after this one begins: chunks of an odd size are followed by a byte of padding.
+    std::uint64_t after(const ContainerItem& item) const { return item.end() + (isMovie() ? 0 : item.size % 2); }
+
+    /// Takes the 32-bit sizes 0 and 2 to 7 literally, as a repair does.
+    void takeSizesLiterally();
+
+private:
+    std::shared_ptr<detail::ByteReader> reader_;
+    Container::Type type_;
+    detail::ExtendedSizes sizes_;
+    std::optional<ContainerItem> first_; ///< the first chunk of a RIFF file whose size is not in its header
+    std::uint64_t position_ = 0;
+    std::uint64_t end_;
+};
+
+/// Returns all items at the top of a container. A movie may hold hundreds of thousands; a walk keeps none of them.
+ZULMETADATA_API std::vector<ContainerItem> topLevelItems(const ByteSource& file, Container::Type type);
 
 } // namespace ZULMetaData

@@ -1,8 +1,7 @@
+#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/ContainerScan.h"
 #include "ZULMetaData/Containers/FileParser.h"
-#include "ZULMetaData/Containers/WideRIFF.h"
-#include "ZULMetaData/StreamExtent.h"
 
 #include <cerrno>
 #include <stdexcept>
@@ -19,7 +18,7 @@ public:
     using Parser::Parser;
 
     void recognize(const std::string& path) requires std::is_base_of_v<detail::FileParser, Parser> {
-        const RecognizedContainer recognized = recognizeContainer(this->getStream(), path);
+        const auto recognized = recognizeContainer(ByteSource::stream(this->getStream()), path);
         if (recognized.type == Container::Unknown)
             throw std::runtime_error(recognized.refusal());
         this->setStreamType(recognized.type);
@@ -27,21 +26,28 @@ public:
 
     void scan() {
         std::istream& stream = this->getStream();
-        const std::uint64_t size = sizeOfInput(stream);
+        const ByteSource file = ByteSource::stream(stream);
+        rewind(stream);
         this->cacheFileStreamInfo();
-        if (this->getStreamType() != Container::Riff)
-            return requireReadable(stream);
         requireReadable(stream);
-        const auto wide = detail::wideRIFF(stream);
-        if (!wide || wide->end >= size)
+        if (this->getStreamType() != Container::Riff)
             return;
-        stream.clear();
-        stream.seekg(0);
+        ItemWalk chunks(file, Container::Riff);
+        const auto first = chunks.next();
+        if (!first || first->sizeSource == ContainerItem::Header || chunks.position() >= file.size())
+            return;
+        rewind(stream);
         detail::StreamCache found;
-        detail::scanChunks(stream, size, found, wide->end + wide->end % 2);
+        detail::scanChunks(stream, file.size(), found, chunks.position());
         requireReadable(stream);
         for (const auto& [type, place] : found)
             this->cacheStream(type, place);
+    }
+
+private:
+    static void rewind(std::istream& stream) {
+        stream.clear();
+        stream.seekg(0);
     }
 };
 
@@ -59,7 +65,6 @@ std::unique_ptr<MetaDataParser> openContainer(const std::string& path) {
 
 std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, Container::Type type) {
     auto parser = std::make_unique<ThoroughParser<detail::StreamParser>>(stream, type);
-    stream.clear();
     parser->scan();
     return parser;
 }

@@ -1,7 +1,8 @@
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 
+#include "ZULMetaData/ByteReader.h"
 #include "ZULMetaData/Containers/AtomFormat.h"
-#include "ZULMetaData/StreamExtent.h"
+#include "ZULMetaData/ZULMMetaDataUUIDs.h"
 
 #include <algorithm>
 #include <array>
@@ -11,12 +12,12 @@ namespace ZULMetaData {
 
 namespace {
 
-constexpr std::array<std::string_view, 3> s_riffSignatures{"RIFF", "RF64", "BW64"};
+constexpr std::array<FourCC, 3> s_riffSignatures{"RIFF", "RF64", "BW64"};
 
 /// What movies begin with. Any other printable type may be the beginning of a text.
-constexpr std::array<std::string_view, 20> s_firstAtoms{"ftyp", "styp", "moov", "moof", "mdat", "free", "skip",
-                                                        "wide", "pnot", "sidx", "ssix", "prft", "emsg", "uuid",
-                                                        "meta", "mfra", "udta", "pdin", "ZULM", "ZULR"};
+constexpr std::array<FourCC, 20> s_firstAtoms{"ftyp", "styp", "moov", "moof", "mdat", "free", "skip",
+                                              "wide", "pnot", "sidx", "ssix", "prft", "emsg", "uuid",
+                                              "meta", "mfra", "udta", "pdin", "ZULM", "ZULR"};
 
 struct ForeignSignature {
     std::string_view bytes;
@@ -54,34 +55,35 @@ bool beginsLikeStream(std::string_view bytes) {
     return std::memcmp(bytes.data() + firstGroup, s_cursorImageUUID.data + firstGroup, sizeof(uuid) - firstGroup) == 0;
 }
 
-bool beginsLikeRIFF(std::string_view bytes) {
-    return bytes.size() >= detail::s_chunkHeaderSize &&
-           std::any_of(s_riffSignatures.begin(), s_riffSignatures.end(),
-                       [&](std::string_view signature) { return bytes.starts_with(signature); });
+template <std::size_t size>
+bool isOneOf(FourCC type, const std::array<FourCC, size>& types) {
+    return std::find(types.begin(), types.end(), type) != types.end();
 }
 
-/// The type and the 32-bit size of the atom that `bytes` begin with, if they are long enough.
-struct FirstAtom {
-    explicit FirstAtom(std::string_view bytes) : isThere(bytes.size() >= detail::s_atomHeaderSize) {
-        if (!isThere)
-            return;
-        std::memcpy(&size, bytes.data(), sizeof size);
-        size = swapInt(size);
-        type = bytes.substr(sizeof size, sizeof size);
+/// The header at the beginning of a file. It may be cut short, except for its type and its 32-bit size.
+struct FirstItem {
+    explicit FirstItem(std::string_view bytes) : isThere(bytes.size() >= detail::s_atomHeaderSize) {
+        detail::ByteReader reader(ByteSource::memory(bytes));
+        detail::ByteCursor atomCursor(reader, 0, bytes.size());
+        detail::ByteCursor chunkCursor(reader, 0, bytes.size());
+        readAtomHeader(atomCursor, detail::ExtendedSizes::Marked, atom);
+        readChunkHeader(chunkCursor, chunk);
     }
 
-    bool hasSize() const {
-        return isThere && (size >= detail::s_atomHeaderSize || size == 0 || size == detail::s_extendedSizeMarker);
+    bool isRIFF() const { return isThere && isOneOf(chunk.type, s_riffSignatures); }
+    bool isAtom() const {
+        return isThere && (atom.sizeField >= detail::s_atomHeaderSize || atom.sizeField == 0 ||
+                           atom.sizeField == detail::s_extendedSizeMarker);
     }
-    bool fits(std::uint64_t fileSize) const { return isThere && size >= detail::s_atomHeaderSize && size <= fileSize; }
-    bool isPrintable() const {
-        return isThere && std::all_of(type.begin(), type.end(), [](char c) { return c >= ' ' && c <= '~'; });
+    bool isKnownAtom() const { return isAtom() && isOneOf(atom.type, s_firstAtoms); }
+    bool fits(std::uint64_t fileSize) const {
+        return isThere && atom.sizeField >= detail::s_atomHeaderSize && atom.sizeField <= fileSize;
     }
-    bool isKnown() const { return std::find(s_firstAtoms.begin(), s_firstAtoms.end(), type) != s_firstAtoms.end(); }
+    bool isPrintable() const { return isThere && atom.type.isPrintable(); }
 
     bool isThere;
-    std::uint32_t size = 0;
-    std::string_view type;
+    ContainerItem atom;
+    ContainerItem chunk;
 };
 
 std::string_view matroskaName(std::string_view bytes) {
@@ -117,23 +119,23 @@ std::string_view foreignNameOf(std::string_view bytes) {
 Container::Type unmistakableType(std::string_view bytes) {
     if (beginsLikeStream(bytes))
         return Container::RawStream;
-    if (beginsLikeRIFF(bytes))
+    const FirstItem item(bytes);
+    if (item.isRIFF())
         return Container::Riff;
-    const FirstAtom atom(bytes);
-    return atom.hasSize() && atom.isKnown() ? Container::QuickTime : Container::Unknown;
+    return item.isKnownAtom() ? Container::QuickTime : Container::Unknown;
 }
 
 /// The type of a file whose first bytes say little.
 Container::Type typeByName(std::string_view bytes, std::uint64_t fileSize, Container::Type named) {
-    const FirstAtom atom(bytes);
+    const FirstItem item(bytes);
     switch (named) {
     case Container::RawStream: return named;
-    case Container::Riff: return atom.isThere ? Container::Unknown : named;
+    case Container::Riff: return item.isThere ? Container::Unknown : named;
     case Container::QuickTime:
-        return !atom.isThere || atom.isPrintable() || atom.fits(fileSize) ? named : Container::Unknown;
+        return !item.isThere || item.isPrintable() || item.fits(fileSize) ? named : Container::Unknown;
     default: break;
     }
-    const bool fits = atom.hasSize() && atom.isPrintable() && atom.size <= fileSize;
+    const bool fits = item.isAtom() && item.isPrintable() && item.atom.sizeField <= fileSize;
     return fits ? Container::QuickTime : Container::Unknown;
 }
 
@@ -142,10 +144,10 @@ Container::Type typeByName(std::string_view bytes, std::uint64_t fileSize, Conta
 Container::Type streamTypeOfContents(std::string_view firstBytes) {
     if (beginsLikeStream(firstBytes))
         return Container::RawStream;
-    if (beginsLikeRIFF(firstBytes))
+    const FirstItem item(firstBytes);
+    if (item.isRIFF())
         return Container::Riff;
-    const FirstAtom atom(firstBytes);
-    return atom.hasSize() && atom.isPrintable() ? Container::QuickTime : Container::Unknown;
+    return item.isAtom() && item.isPrintable() ? Container::QuickTime : Container::Unknown;
 }
 
 std::string_view extensionFor(Container::Type type) {
@@ -177,13 +179,10 @@ RecognizedContainer recognizeContainer(std::string_view firstBytes, std::uint64_
     return recognized;
 }
 
-RecognizedContainer recognizeContainer(std::istream& file, const std::string& name) {
-    const std::uint64_t size = sizeOfInput(file);
+RecognizedContainer recognizeContainer(const ByteSource& file, const std::string& name) {
     std::array<char, s_recognitionBytes> first;
-    const std::size_t count = readingFrom(file)(0, first);
-    file.clear();
-    file.seekg(0);
-    return recognizeContainer({first.data(), count}, size, name);
+    const std::size_t count = file.read(0, first);
+    return recognizeContainer({first.data(), count}, file.size(), name);
 }
 
 } // namespace ZULMetaData

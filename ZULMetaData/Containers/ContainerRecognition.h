@@ -2,12 +2,13 @@
 
 // Tells what a file is by its first bytes, and by its name only if those say nothing.
 //
-//     std::ifstream file("Recording.m4v", std::ios::binary);
+//     const ByteSource file = ByteSource::file("Recording.m4v");
 //     const RecognizedContainer recognized = recognizeContainer(file, "Recording.m4v");
 //     if (recognized.type == Container::Unknown)
 //         std::cerr << "Recording.m4v: " << recognized.refusal() << '\n';
 
 #include "../../SharedDependencies/Export.h"
+#include "../ByteSource.h"
 #include "../ZULMMetaDataParser.h"
 
 #include <cstddef>
@@ -46,8 +47,8 @@ struct ZULMETADATA_API RecognizedContainer {
 ZULMETADATA_API RecognizedContainer recognizeContainer(std::string_view firstBytes, std::uint64_t fileSize,
                                                        const std::string& name);
 
-/// Clears the state of `file` and leaves it at its start. Throws `std::system_error` if reading fails.
-ZULMETADATA_API RecognizedContainer recognizeContainer(std::istream& file, const std::string& name);
+/// Throws `std::system_error` if reading fails.
+ZULMETADATA_API RecognizedContainer recognizeContainer(const ByteSource& file, const std::string& name);
 
 /// Opens a file as `MetaDataParser::create` does, but takes it for what `recognizeContainer` says, and finds the
 /// streams after a RIFF chunk of 64-bit or unknown size as well. Throws `std::system_error` if the file cannot be

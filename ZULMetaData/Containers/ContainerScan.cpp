@@ -29,43 +29,38 @@ bool storeStream(PositionedInput& input, std::uint64_t length, StreamCache& foun
     return true;
 }
 
-/// Hands size, type and end of every atom from here to `end` to `visit`, which may read on and stops the walk by
-/// false. So does an atom that has no end to go on from.
+/// Calls `visit` with every atom from here to `end`. It may read on, and ends the walk by false. An atom without an end
+/// to go on from ends it too.
 template <class Visit>
 void walkAtoms(PositionedInput& input, std::uint64_t end, Visit visit) {
     while (input.position() < end && input.position() < input.total()) {
-        const std::uint64_t start = input.position();
-        std::uint64_t size = 0;
-        std::uint32_t type = 0;
-        if (!input.readAtomSizeAndType(size, type) || size == 0)
+        ContainerItem atom;
+        if (!readAtomHeader(input, ExtendedSizes::BelowHeader, atom) || atom.size == 0)
             return;
-        const std::uint64_t atomEnd = start + size;
-        const bool wrapsAround = atomEnd < start;
-        if (!visit(size, type, atomEnd) || wrapsAround || !input.moveTo(atomEnd))
+        const bool wrapsAround = atom.end() < atom.offset;
+        if (!visit(atom) || wrapsAround || !input.moveTo(atom.end()))
             return;
     }
 }
 
-bool visitStreamAtom(PositionedInput& input, std::uint64_t size, std::uint32_t type, StreamCache& found) {
-    if (type == s_streamAtom) // always taken for one with an extended header, the only form that is written
-        return storeStream(input, size - s_extendedAtomHeaderSize, found);
+bool visitStreamAtom(PositionedInput& input, const ContainerItem& atom, StreamCache& found) {
+    if (atom.holdsStream()) // always taken for one with an extended header, the only form that is written
+        return storeStream(input, atom.size - s_extendedAtomHeaderSize, found);
     std::cerr << "Found a non DATA atom mixed in the ZUL meta data\n";
     return true;
 }
 
-/// `visit` gets type and size of every chunk from here to `end`; false stops the walk. The walk gives false where
-/// a chunk of size 0 ended it.
+/// Calls `visit` with every chunk from here to `end`; it ends the walk by false. Returns false if a chunk of size 0
+/// ended the walk.
 template <class Visit>
 bool walkChunks(PositionedInput& input, std::uint64_t end, Visit visit) {
     while (input.position() < end && input.position() < input.total()) {
-        const std::uint64_t dataStart = input.position() + s_chunkHeaderSize;
-        std::uint32_t type = 0;
-        std::uint32_t size = 0;
-        if (!input.readChunkTypeAndSize(type, size))
+        ContainerItem chunk;
+        if (!readChunkHeader(input, chunk))
             return true;
-        if (size == 0)
+        if (chunk.sizeField == 0)
             return false;
-        if (!visit(type, size, dataStart))
+        if (!visit(chunk))
             return true;
     }
     return true;
@@ -75,11 +70,10 @@ bool walkChunks(PositionedInput& input, std::uint64_t end, Visit visit) {
 
 void scanAtoms(std::istream& stream, std::uint64_t total, StreamCache& found) {
     PositionedInput input(stream, 0, total);
-    walkAtoms(input, total, [&](std::uint64_t, std::uint32_t type, std::uint64_t atomEnd) {
-        if (type == s_metaDataAtom)
-            walkAtoms(input, atomEnd, [&](std::uint64_t childSize, std::uint32_t childType, std::uint64_t) {
-                return visitStreamAtom(input, childSize, childType, found);
-            });
+    walkAtoms(input, total, [&](const ContainerItem& atom) {
+        if (atom.holdsMetaData())
+            walkAtoms(input, atom.end(),
+                      [&](const ContainerItem& child) { return visitStreamAtom(input, child, found); });
         return true;
     });
 }
@@ -87,19 +81,18 @@ void scanAtoms(std::istream& stream, std::uint64_t total, StreamCache& found) {
 void scanChunks(std::istream& stream, std::uint64_t total, StreamCache& found, std::uint64_t begin) {
     PositionedInput input(stream, 0, total);
     input.moveTo(begin);
-    const auto visitStreamChunk = [&](std::uint32_t type, std::uint32_t size, std::uint64_t dataStart) {
-        if (type != chunkType(s_streamAtom))
+    const auto visitStreamChunk = [&](const ContainerItem& chunk) {
+        if (!chunk.holdsStream())
             std::cerr << "Found a non DATA chunk mixed in the ZUL meta data\n";
-        else if (!storeStream(input, size, found))
+        else if (!storeStream(input, chunk.sizeField, found))
             return false;
-        const std::uint32_t padded = size + (size & 1); // the largest odd size wraps to 0
-        return input.moveTo(dataStart + padded);
+        const std::uint32_t padded = chunk.sizeField + (chunk.sizeField & 1); // the largest odd size wraps to 0
+        return input.moveTo(chunk.payloadOffset() + padded);
     };
-    walkChunks(input, total, [&](std::uint32_t type, std::uint32_t size, std::uint64_t dataStart) {
-        const std::uint64_t chunkEnd = dataStart + size;
-        if (type == chunkType(s_metaDataAtom) && !walkChunks(input, chunkEnd, visitStreamChunk))
+    walkChunks(input, total, [&](const ContainerItem& chunk) {
+        if (chunk.holdsMetaData() && !walkChunks(input, chunk.end(), visitStreamChunk))
             return false; // a stream chunk of size 0 ends the whole scan
-        return input.moveTo(chunkEnd + (size & 1));
+        return input.moveTo(chunk.end() + (chunk.size & 1));
     });
 }
 

@@ -1,15 +1,13 @@
 #include "ZULMetaData/Containers/MovieDuration.h"
 
+#include "ZULMetaData/ByteReader.h"
 #include "ZULMetaData/Containers/ContainerLayout.h"
-#include "ZULMetaData/PositionedInput.h"
 
 #include <algorithm>
 #include <bit>
 #include <deque>
 #include <limits>
 #include <map>
-#include <string_view>
-#include <vector>
 
 namespace ZULMetaData {
 
@@ -17,7 +15,6 @@ namespace {
 
 constexpr std::size_t s_mostFragments = 50000;
 constexpr std::size_t s_lastFragments = 64;
-constexpr std::size_t s_batch = 4096;
 
 /// A part of the media in the track's own time.
 struct Track {
@@ -33,55 +30,44 @@ struct Track {
 /// The fields of one atom, one after the other.
 class Fields {
 public:
-    Fields(std::istream& stream, const ContainerItem& atom, std::uint64_t total)
-        : input_(atStart(stream), 0, std::min(total, atom.end())) {
-        isWhole_ = input_.moveTo(atom.payloadOffset());
-    }
+    Fields(const ItemWalk& atoms, const ContainerItem& atom)
+        : cursor_(atoms.reader(), atom.payloadOffset(), std::min(atoms.end(), atom.end())) {}
 
+    /// Returns 0 if the field is not there.
     template <class Integer>
     Integer next() {
         Integer value = 0;
-        isWhole_ = isWhole_ && input_.readBigEndian(value);
-        return isWhole_ ? value : 0;
+        isWhole_ = isWhole_ && cursor_.readBigEndian(value);
+        return value;
     }
 
-    /// A time or a duration, which has 64 bits in version 1 and 32 in every other. All ones are an open one.
+    /// Reads a time or a duration, which has 64 bits in version 1 and 32 in every other. All ones are an open one.
     double nextTime(std::uint32_t versionAndFlags) {
         return versionAndFlags >> 24 == 1 ? timeOf(next<std::uint64_t>()) : timeOf(next<std::uint32_t>());
     }
 
-    void skip(std::uint64_t bytes) { isWhole_ = isWhole_ && input_.moveTo(input_.position() + bytes); }
+    void skip(std::uint64_t bytes) { cursor_.skip(bytes); }
     bool isWhole() const { return isWhole_; }
     bool isOpen() const { return isOpen_; } ///< whether the last time was
-    std::uint64_t left() const { return input_.total() - std::min(input_.total(), input_.position()); }
 
 private:
-    static std::istream& atStart(std::istream& stream) {
-        stream.clear();
-        stream.seekg(0);
-        return stream;
-    }
-
     template <class Integer>
     double timeOf(Integer value) {
         isOpen_ = value == std::numeric_limits<Integer>::max();
         return static_cast<double>(value);
     }
 
-    detail::PositionedInput input_;
-    bool isWhole_ = false;
+    detail::ByteCursor cursor_;
+    bool isWhole_ = true;
     bool isOpen_ = false;
 };
 
 class Clock {
 public:
-    explicit Clock(std::istream& stream) : stream_(stream) {
-        stream_.clear();
-        total_ = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream_));
-    }
+    explicit Clock(const ByteSource& movie) : atoms_(movie, Container::QuickTime) {}
 
     std::optional<double> duration() {
-        const auto moov = firstAtTop("moov");
+        const auto moov = first(atoms_, "moov");
         if (!moov) {
             visitFragments();
             return indexed();
@@ -99,46 +85,26 @@ public:
     }
 
 private:
-    /// Not those that reach beyond their parent: however they overlap, no byte is read more than once.
-    template <class Visit>
-    void visitChildren(const ContainerItem& parent, Visit visit) {
-        visitAtoms(stream_, parent.payloadOffset(), parent.end(), std::min(total_, parent.end()),
-                   [&](const ContainerItem& child) {
-                       const bool isInside = child.end() >= child.offset && child.end() <= parent.end();
-                       return isInside && visit(child);
-                   });
+    static std::optional<ContainerItem> first(ItemWalk atoms, FourCC type) {
+        while (const auto atom = atoms.next())
+            if (atom->type == type)
+                return atom;
+        return std::nullopt;
     }
 
+    /// Passes over a child that reaches beyond its parent, so that no byte is read more than once, however they
+    /// overlap.
     template <class Visit>
     void forEachChild(const ContainerItem& parent, Visit visit) {
-        constexpr std::size_t most = 1000;
-        std::vector<ContainerItem> children;
-        visitChildren(parent, [&](const ContainerItem& child) {
-            children.push_back(child);
-            return children.size() < most;
-        });
-        for (const ContainerItem& child : children)
-            visit(child);
+        ItemWalk children = atoms_.inside(parent);
+        for (auto child = children.next(); child && child->fits(parent.end()); child = children.next())
+            visit(*child);
     }
 
-    std::optional<ContainerItem> firstChild(const ContainerItem& parent, std::string_view type) {
-        std::optional<ContainerItem> found;
-        visitChildren(parent, [&](const ContainerItem& child) {
-            if (child.type == type)
-                found = child;
-            return !found;
-        });
-        return found;
-    }
-
-    std::optional<ContainerItem> firstAtTop(std::string_view type) {
-        std::optional<ContainerItem> found;
-        visitTopLevel(stream_, Container::QuickTime, [&](const ContainerItem& item) {
-            if (item.type == type)
-                found = item;
-            return !found;
-        });
-        return found;
+    std::optional<ContainerItem> firstChild(const ContainerItem& parent, FourCC type) {
+        ItemWalk children = atoms_.inside(parent);
+        const auto child = first(children, type);
+        return child && child->fits(parent.end()) ? child : std::nullopt;
     }
 
     std::optional<double> declared(const ContainerItem& moov);
@@ -153,12 +119,10 @@ private:
     std::optional<double> ofFragments(bool beginsAtZero) const;
     std::optional<double> indexed() const;
 
-    std::istream& stream_;
-    std::uint64_t total_ = 0;
+    ItemWalk atoms_;
     bool isCounted_ = false; ///< whether the movie has a timescale
     std::uint32_t timescale_ = 0;
     std::map<std::uint32_t, Track> tracks_;
-    std::size_t fragments_ = 0;
     bool areAllRead_ = true;
     std::optional<double> indexBegin_;
     double indexEnd_ = 0;
@@ -169,7 +133,7 @@ std::optional<double> Clock::declared(const ContainerItem& moov) {
     const auto header = firstChild(moov, "mvhd");
     if (!header)
         return std::nullopt;
-    Fields fields(stream_, *header, total_);
+    Fields fields(atoms_, *header);
     const auto version = fields.next<std::uint32_t>();
     fields.nextTime(version);
     fields.nextTime(version);
@@ -184,7 +148,7 @@ std::optional<double> Clock::declaredOfFragments(const ContainerItem& extension)
     const auto header = firstChild(extension, "mehd");
     if (!header)
         return std::nullopt;
-    Fields fields(stream_, *header, total_);
+    Fields fields(atoms_, *header);
     const double duration = fields.nextTime(fields.next<std::uint32_t>());
     const bool isTold = fields.isWhole() && !fields.isOpen() && duration > 0;
     return isTold ? std::optional(duration / timescale_) : std::nullopt;
@@ -198,7 +162,7 @@ void Clock::readTracks(const ContainerItem& moov, const ContainerItem& extension
     forEachChild(extension, [&](const ContainerItem& child) {
         if (child.type != "trex")
             return;
-        Fields fields(stream_, child, total_); // [version and flags][track][description][duration]
+        Fields fields(atoms_, child); // [version and flags][track][description][duration]
         fields.skip(sizeof(std::uint32_t));
         const auto id = fields.next<std::uint32_t>();
         fields.skip(sizeof(std::uint32_t));
@@ -214,12 +178,12 @@ void Clock::readTrack(const ContainerItem& trak) {
     const auto mediaHeader = media ? firstChild(*media, "mdhd") : std::nullopt;
     if (!header || !mediaHeader)
         return;
-    Fields fields(stream_, *header, total_); // [version and flags][created][changed][track]
+    Fields fields(atoms_, *header); // [version and flags][created][changed][track]
     const auto version = fields.next<std::uint32_t>();
     fields.nextTime(version);
     fields.nextTime(version);
     const auto id = fields.next<std::uint32_t>();
-    Fields mediaFields(stream_, *mediaHeader, total_); // [version and flags][created][changed][timescale][duration]
+    Fields mediaFields(atoms_, *mediaHeader); // [version and flags][created][changed][timescale][duration]
     const auto mediaVersion = mediaFields.next<std::uint32_t>();
     mediaFields.nextTime(mediaVersion);
     mediaFields.nextTime(mediaVersion);
@@ -229,37 +193,27 @@ void Clock::readTrack(const ContainerItem& trak) {
     track.end = mediaFields.isOpen() ? 0 : duration;
 }
 
-/// In batches: the stream may not be moved during a visit.
 void Clock::visitFragments() {
     std::deque<ContainerItem> last;
-    std::vector<ContainerItem> batch;
-    for (std::uint64_t position = 0; position < total_;) {
-        batch.clear();
-        std::uint64_t end = total_;
-        visitAtoms(stream_, position, total_, total_, [&](const ContainerItem& item) {
-            end = item.size == 0 || item.end() <= item.offset ? total_ : item.end();
-            if (item.type == "moof" || item.type == "sidx")
-                batch.push_back(item);
-            return batch.size() < s_batch;
-        });
-        position = end;
-        for (const ContainerItem& item : batch) {
-            if (item.type == "sidx")
-                readIndex(item);
-            else if (fragments_++ < s_mostFragments)
-                readFragment(item);
-            else
-                last.push_back(item);
-            if (last.size() > s_lastFragments) {
-                last.pop_front();
-                areAllRead_ = false;
-            }
+    std::size_t fragments = 0;
+    ItemWalk atoms = atoms_;
+    while (const auto atom = atoms.next()) {
+        if (atom->type == "sidx")
+            readIndex(*atom);
+        if (atom->type != "moof")
+            continue;
+        if (fragments++ < s_mostFragments) {
+            readFragment(*atom);
+            continue;
         }
-        if (batch.size() < s_batch)
-            break;
+        last.push_back(*atom);
+        if (last.size() > s_lastFragments) {
+            last.pop_front();
+            areAllRead_ = false;
+        }
     }
-    for (const ContainerItem& item : last)
-        readFragment(item);
+    for (const ContainerItem& moof : last)
+        readFragment(moof);
 }
 
 void Clock::readFragment(const ContainerItem& moof) {
@@ -279,14 +233,14 @@ void Clock::readTrackFragment(const ContainerItem& traf) {
     double length = 0;
     forEachChild(traf, [&](const ContainerItem& child) {
         if (child.type == "tfhd") {
-            Fields fields(stream_, child, total_); // [version and flags][track][offset: 8][description][duration]
+            Fields fields(atoms_, child); // [version and flags][track][offset: 8][description][duration]
             const auto flags = fields.next<std::uint32_t>();
             const auto found = tracks_.find(fields.next<std::uint32_t>());
             track = found == tracks_.end() ? nullptr : &found->second;
             fields.skip((flags & hasOffset ? 8 : 0) + (flags & hasDescription ? 4 : 0));
             defaultDuration = flags & hasDuration ? fields.next<std::uint32_t>() : track ? track->defaultDuration : 0;
         } else if (child.type == "tfdt") {
-            Fields fields(stream_, child, total_); // [version and flags][begin]
+            Fields fields(atoms_, child); // [version and flags][begin]
             const double time = fields.nextTime(fields.next<std::uint32_t>());
             if (fields.isWhole())
                 begin = time;
@@ -310,7 +264,7 @@ double Clock::durationOfRun(const ContainerItem& trun, std::uint32_t defaultDura
     constexpr std::uint32_t hasFirstFlags = 0x4;
     constexpr std::uint32_t hasDuration = 0x100;
     constexpr std::uint32_t ofSample = 0xf00;
-    Fields fields(stream_, trun, total_);
+    Fields fields(atoms_, trun);
     const auto flags = fields.next<std::uint32_t>();
     const auto samples = fields.next<std::uint32_t>();
     if (!(flags & hasDuration))
@@ -325,7 +279,7 @@ double Clock::durationOfRun(const ContainerItem& trun, std::uint32_t defaultDura
 
 /// [version and flags][track][timescale][begin][offset][reserved: 2][count: 2][size, duration, access point of each]
 void Clock::readIndex(const ContainerItem& sidx) {
-    Fields fields(stream_, sidx, total_);
+    Fields fields(atoms_, sidx);
     const auto version = fields.next<std::uint32_t>();
     fields.skip(sizeof(std::uint32_t));
     const auto timescale = fields.next<std::uint32_t>();
@@ -365,14 +319,12 @@ std::optional<double> Clock::indexed() const {
 
 } // namespace
 
-std::optional<double> movieDuration(MetaDataParser& movie) {
-    return movieDuration(movie.getStream(), movie.getStreamType());
+std::optional<double> movieDuration(const ByteSource& file, Container::Type type) {
+    return type == Container::QuickTime ? Clock(file).duration() : std::nullopt;
 }
 
-std::optional<double> movieDuration(std::istream& stream, Container::Type type) {
-    if (type != Container::QuickTime)
-        return std::nullopt;
-    return Clock(stream).duration();
+std::optional<double> movieDuration(MetaDataParser& movie) {
+    return movieDuration(ByteSource::stream(movie.getStream()), movie.getStreamType());
 }
 
 } // namespace ZULMetaData

@@ -1,9 +1,9 @@
 #pragma once
 
 #include "../../SharedDependencies/Export.h"
+#include "../ByteSource.h"
 #include "../ZULMMetaDataParser.h"
 
-#include <istream>
 #include <optional>
 
 namespace ZULMetaData {
@@ -14,10 +14,10 @@ namespace ZULMetaData {
 ///
 /// Returns nothing for a movie without a header, as while it is still being recorded, for a header that is cut short,
 /// counts in no timescale or leaves the duration open, and for any other container. A file of segments without a header
-/// lasts as long as its segment indexes (`sidx`) say.
+/// lasts as long as its segment indexes (`sidx`) say. Throws `std::system_error` if reading fails.
 ///@{
+ZULMETADATA_API std::optional<double> movieDuration(const ByteSource& file, Container::Type type);
 ZULMETADATA_API std::optional<double> movieDuration(MetaDataParser& movie);
-ZULMETADATA_API std::optional<double> movieDuration(std::istream& stream, Container::Type type);
 ///@}
 
 } // namespace ZULMetaData

@@ -1,26 +1,22 @@
 #include "ZULMetaData/Containers/RecordingInfo.h"
 
+#include "ZULMetaData/ByteReader.h"
 #include "ZULMetaData/Containers/ContainerLayout.h"
 
 namespace ZULMetaData {
 
-std::vector<ZCAPHeader> readRecordingInfo(MetaDataParser& movie) {
-    std::vector<ContainerItem> atoms;
-    std::istream& stream = movie.getStream();
-    visitTopLevel(stream, movie.getStreamType(), [&](const ContainerItem& atom) {
-        if (atom.type == "ZULR" && atom.payloadSize() >= sizeof(ZCAPHeader))
-            atoms.push_back(atom);
-        return true;
-    });
+std::vector<ZCAPHeader> readRecordingInfo(const ByteSource& file, Container::Type type) {
     std::vector<ZCAPHeader> infos;
-    for (const ContainerItem& atom : atoms) {
-        ZCAPHeader info;
-        stream.clear();
-        stream.seekg(static_cast<std::streamoff>(atom.payloadOffset()));
-        if (stream.read(reinterpret_cast<char*>(&info), sizeof info))
-            infos.push_back(info);
-    }
+    ItemWalk items(file, type);
+    while (const auto item = items.next())
+        if (item->holdsRecordingInfo() && item->payloadSize() >= sizeof(ZCAPHeader))
+            if (const auto info = items.reader().numberAt<ZCAPHeader>(item->payloadOffset()))
+                infos.push_back(*info);
     return infos;
+}
+
+std::vector<ZCAPHeader> readRecordingInfo(MetaDataParser& recording) {
+    return readRecordingInfo(ByteSource::stream(recording.getStream()), recording.getStreamType());
 }
 
 } // namespace ZULMetaData

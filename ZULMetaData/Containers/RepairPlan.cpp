@@ -1,14 +1,13 @@
 #include "ZULMetaData/Containers/RepairPlan.h"
 
 #include "SharedDependencies/ZCAPHeader.h"
+#include "ZULMetaData/ByteReader.h"
 #include "ZULMetaData/Containers/AtomFormat.h"
-#include "ZULMetaData/PositionedInput.h"
-#include "ZULMetaData/StreamExtent.h"
+#include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
 
 #include <algorithm>
 #include <optional>
-#include <span>
 #include <utility>
 
 namespace ZULMetaData {
@@ -23,48 +22,26 @@ constexpr std::uint64_t s_smallestStreamAtom = detail::s_extendedAtomHeaderSize 
 /// How much `Util::finalizeAtomsInFile` leaves out of the length of an atom that takes the spare atom in.
 constexpr std::uint64_t s_shortBy = detail::s_atomHeaderSize;
 
-struct Atom {
-    std::uint64_t start = 0;
-    std::uint64_t size = 0; ///< as declared
-    std::uint32_t shortSize = 0;
-    std::uint32_t type = 0;
-
-    bool isExtended() const { return shortSize == detail::s_extendedSizeMarker; }
-    bool hasOpenEnd() const { return shortSize == 0; }
-    std::uint64_t headerSize() const {
-        return isExtended() ? detail::s_extendedAtomHeaderSize : detail::s_atomHeaderSize;
-    }
-    std::uint64_t end() const { return start + size; }
-    std::uint64_t sizeField() const { return start + detail::s_extendedSizeOffset; }
-};
-
 /// Whether this library appends atoms like this one.
-bool isOwn(const Atom& atom) {
-    return atom.isExtended() && (atom.type == detail::s_metaDataAtom || atom.type == detail::s_recordingInfoAtom);
+bool isOwn(const ContainerItem& atom) {
+    return atom.isExtended() && (atom.holdsMetaData() || atom.holdsRecordingInfo());
 }
 
 /// Whether a movie that lacks a part of the atom may not play.
-bool isMedia(const Atom& atom) {
-    return atom.type == detail::fourCC("moov") || atom.type == detail::fourCC("mdat") ||
-           atom.type == detail::fourCC("moof");
+bool isMedia(const ContainerItem& atom) {
+    return atom.type == "moov" || atom.type == "mdat" || atom.type == "moof";
 }
 
-bool isReadable(std::uint32_t type) {
-    const auto characters = detail::bigEndianBytes(type);
-    return std::all_of(characters.begin(), characters.end(), [](char c) { return c >= ' ' && c <= '~'; });
+std::uint64_t sizeFieldOf(const ContainerItem& atom) {
+    return atom.offset + detail::s_extendedSizeOffset;
 }
 
-std::string typeText(std::uint32_t type) {
-    if (!isReadable(type))
-        return "without a readable type";
-    const auto characters = detail::bigEndianBytes(type);
-    std::string text(1, '\'');
-    text.append(characters.data(), characters.size());
-    return text += '\'';
+std::string typeText(FourCC type) {
+    return type.isPrintable() ? '\'' + type.text() + '\'' : "without a readable type";
 }
 
-std::string nameOf(const Atom& atom) {
-    return "the atom " + typeText(atom.type) + " at offset " + std::to_string(atom.start);
+std::string nameOf(const ContainerItem& atom) {
+    return "the atom " + typeText(atom.type) + " at offset " + std::to_string(atom.offset);
 }
 
 std::string bytesText(std::uint64_t count) {
@@ -88,7 +65,9 @@ std::string text(const Bytes& bytes) {
 
 class Planner {
 public:
-    explicit Planner(std::istream& movie) : input_(movie, 0, sizeOf(movie)), total_(input_.total()) {}
+    explicit Planner(const ByteSource& movie) : atoms_(movie, Container::QuickTime), total_(movie.size()) {
+        atoms_.takeSizesLiterally();
+    }
 
     RepairPlan plan() {
         walk();
@@ -100,80 +79,50 @@ public:
     }
 
 private:
-    /// Leaves it at its start.
-    static std::uint64_t sizeOf(std::istream& movie) {
-        movie.clear();
-        movie.seekg(0);
-        return sizeOfInput(movie);
-    }
-
     void walk();
-    void walkOver(const Atom& atom, std::uint64_t& position);
+    void walkOver(const ContainerItem& atom, std::uint64_t& position);
     void endInsideHeader(std::uint64_t position);
     bool beginsAppend(std::uint64_t position);
 
     bool isFollowedByStrayBytes();
-    bool mendTail(const Atom& last);
-    void closeCutTail(const Atom& last);
+    bool mendTail(const ContainerItem& last);
+    void closeCutTail(const ContainerItem& last);
     void setStrayBytesAside(std::uint64_t begin);
 
-    void closeOpenEnd(const Atom& last);
-    void closeInterruptedAppend(const Atom& last);
-    void closeMetaData(const Atom& metaData);
-    std::uint64_t endOfWholeStreams(const Atom& metaData);
-    std::uint64_t endOfTornStream(const Atom& stream);
+    void closeOpenEnd(const ContainerItem& last);
+    void closeInterruptedAppend(const ContainerItem& last);
+    void closeMetaData(const ContainerItem& metaData);
+    std::uint64_t endOfWholeStreams(const ContainerItem& metaData);
+    std::uint64_t endOfTornStream(const ContainerItem& stream);
     void setAside(std::uint64_t begin, const std::string& what);
 
-    bool isLeftShort(const Atom& atom);
+    bool isLeftShort(const ContainerItem& atom);
     bool isAppended(std::uint64_t position);
     bool beginsStreamAtom(std::uint64_t position);
 
-    std::size_t read(std::uint64_t position, std::span<char> bytes);
     std::string bytesAt(std::uint64_t position, std::uint64_t count);
-    std::optional<Atom> atomAt(std::uint64_t position);
-    std::optional<Atom> streamAtomAt(std::uint64_t position);
+    std::optional<ContainerItem> streamAtomAt(std::uint64_t position);
 
     void change(std::uint64_t offset, std::string after, std::string reason);
-    void find(const Atom& atom, const std::string& what);
-    void giveUp(const Atom& atom, const std::string& what);
+    void find(const ContainerItem& atom, const std::string& what);
+    void giveUp(const ContainerItem& atom, const std::string& what);
     void lose(const std::string& what);
 
-    detail::PositionedInput input_;
+    ItemWalk atoms_;
     std::uint64_t total_;
-    Atom previous_; ///< the atom before the one that is looked at; of size 0 at the beginning
+    ContainerItem previous_; ///< the atom before the one that is looked at; of size 0 at the beginning
     RepairPlan plan_;
 };
 
-/// As `ReadBytes`, by the input that the walk goes on with.
-std::size_t Planner::read(std::uint64_t position, std::span<char> bytes) {
-    const std::uint64_t left = total_ - std::min(position, total_);
-    const auto size = static_cast<std::size_t>(std::min<std::uint64_t>(bytes.size(), left));
-    return input_.moveTo(position) && input_.read(bytes.data(), size) ? size : 0;
-}
-
 std::string Planner::bytesAt(std::uint64_t position, std::uint64_t count) {
-    std::string bytes(static_cast<std::size_t>(count), '\0');
-    bytes.resize(read(position, bytes));
-    return bytes;
-}
-
-/// None where the file ends inside the header.
-std::optional<Atom> Planner::atomAt(std::uint64_t position) {
-    Atom atom;
-    atom.start = position;
-    if (!input_.moveTo(position) || !input_.readBigEndian(atom.shortSize) || !input_.readBigEndian(atom.type))
-        return std::nullopt;
-    atom.size = atom.shortSize;
-    if (atom.isExtended() && !input_.readBigEndian(atom.size))
-        return std::nullopt;
-    return atom;
+    return std::string(atoms_.reader().at(position, count));
 }
 
 /// A `DATA` atom as this library writes it, with its stream's header. Its end may lie anywhere after that.
-std::optional<Atom> Planner::streamAtomAt(std::uint64_t position) {
-    const auto atom = atomAt(position);
-    if (!atom || !atom->isExtended() || atom->type != detail::s_streamAtom || atom->size < s_smallestStreamAtom ||
-        atom->end() < atom->start || total_ - position < s_smallestStreamAtom)
+std::optional<ContainerItem> Planner::streamAtomAt(std::uint64_t position) {
+    const auto atom = atoms_.itemAt(position);
+    if (!atom || !atom->isExtended() || !atom->holdsStream() || atom->size < s_smallestStreamAtom ||
+        atom->end() < atom->offset || total_ - position < s_smallestStreamAtom)
         return std::nullopt;
     return atom;
 }
@@ -184,14 +133,14 @@ void Planner::change(std::uint64_t offset, std::string after, std::string reason
 }
 
 /// The first finding is the one that the others follow from.
-void Planner::find(const Atom& atom, const std::string& what) {
+void Planner::find(const ContainerItem& atom, const std::string& what) {
     if (!plan_.finding.empty())
         return;
     plan_.finding = nameOf(atom) + " " + what;
-    plan_.offset = atom.start;
+    plan_.offset = atom.offset;
 }
 
-void Planner::giveUp(const Atom& atom, const std::string& what) {
+void Planner::giveUp(const ContainerItem& atom, const std::string& what) {
     plan_.finding.clear();
     find(atom, what);
     plan_.state = RepairPlan::Unrepairable;
@@ -204,10 +153,10 @@ void Planner::lose(const std::string& what) {
 
 void Planner::walk() {
     for (std::uint64_t position = 0; position < total_ && plan_.state == RepairPlan::Whole;) {
-        const auto atom = atomAt(position);
+        const auto atom = atoms_.itemAt(position);
         if (!atom)
             return endInsideHeader(position);
-        if (atom->hasOpenEnd())
+        if ((atom->sizeField == 0))
             return closeOpenEnd(*atom);
         if (atom->isExtended() && atom->size == 0)
             return closeInterruptedAppend(*atom);
@@ -245,9 +194,9 @@ bool Planner::beginsAppend(std::uint64_t position) {
 /// Whether what follows the atom before belongs to nothing: the atom is one of this library, and its contents end where
 /// it does. If it was given a wrong size, its own streams would follow it.
 bool Planner::isFollowedByStrayBytes() {
-    if (!isOwn(previous_) || previous_.type == detail::s_recordingInfoAtom)
+    if (!isOwn(previous_) || previous_.holdsRecordingInfo())
         return isOwn(previous_) && previous_.size == detail::s_extendedAtomHeaderSize + sizeof(ZCAPHeader);
-    std::uint64_t end = previous_.start + detail::s_extendedAtomHeaderSize;
+    std::uint64_t end = previous_.offset + detail::s_extendedAtomHeaderSize;
     while (end < previous_.end()) {
         const auto stream = streamAtomAt(end);
         if (!stream)
@@ -259,27 +208,28 @@ bool Planner::isFollowedByStrayBytes() {
 
 /// Mends a last atom that does not fit into the file, if the atom or the one before it belongs to this library: a movie
 /// plays whatever stands there. Returns false for any other atom.
-bool Planner::mendTail(const Atom& last) {
-    const bool isCutShort = last.size >= last.headerSize();
-    if (isOwn(last) && isCutShort && last.start > 0)
+bool Planner::mendTail(const ContainerItem& last) {
+    const bool isCutShort = last.size >= last.headerSize;
+    if (isOwn(last) && isCutShort && last.offset > 0)
         closeCutTail(last);
     else if (isFollowedByStrayBytes() && !isMedia(last) && !isOwn(last))
-        setStrayBytesAside(last.start);
+        setStrayBytesAside(last.offset);
     else
         return false;
     return true;
 }
 
-void Planner::closeCutTail(const Atom& last) {
-    find(last, "declares " + bytesText(last.size) + ", but the file ends after " + std::to_string(total_ - last.start));
-    if (last.type == detail::s_metaDataAtom) {
+void Planner::closeCutTail(const ContainerItem& last) {
+    find(last,
+         "declares " + bytesText(last.size) + ", but the file ends after " + std::to_string(total_ - last.offset));
+    if (last.holdsMetaData()) {
         closeMetaData(last);
         if (!plan_.hasLoss)
             lose("the streams that followed its last one are missing");
         return;
     }
     lose("the name and the versions in it are incomplete and are dropped");
-    setAside(last.start, "an atom that was cut short");
+    setAside(last.offset, "an atom that was cut short");
 }
 
 void Planner::setStrayBytesAside(std::uint64_t begin) {
@@ -289,21 +239,21 @@ void Planner::setStrayBytesAside(std::uint64_t begin) {
     setAside(begin, "no atom");
 }
 
-void Planner::walkOver(const Atom& atom, std::uint64_t& position) {
-    const bool fits = atom.size >= atom.headerSize() && atom.size <= total_ - atom.start;
+void Planner::walkOver(const ContainerItem& atom, std::uint64_t& position) {
+    const bool fits = atom.size >= atom.headerSize && atom.size <= total_ - atom.offset;
     if (!fits && mendTail(atom)) {
         position = total_;
         return;
     }
-    if (atom.size < atom.headerSize())
+    if (atom.size < atom.headerSize)
         return giveUp(atom, "declares " + bytesText(atom.size) + ", which its own header does not fit in");
-    if (atom.size > total_ - atom.start)
+    if (atom.size > total_ - atom.offset)
         return giveUp(atom, "declares " + bytesText(atom.size) + ", but the file ends after " +
-                                std::to_string(total_ - atom.start));
+                                std::to_string(total_ - atom.offset));
     position = atom.end();
     if (plan_.state == RepairPlan::Whole && isLeftShort(atom)) {
         find(atom, "was given a length that leaves out its last 8 bytes");
-        change(atom.sizeField(), text(detail::bigEndianBytes(atom.size + s_shortBy)),
+        change(sizeFieldOf(atom), text(detail::bigEndianBytes(atom.size + s_shortBy)),
                "The length takes in the last 8 bytes of the media.");
         position += s_shortBy;
     }
@@ -311,7 +261,7 @@ void Planner::walkOver(const Atom& atom, std::uint64_t& position) {
 
 /// Whether an atom, after which the walk can go on, was repaired to 8 bytes less than it has. It is then followed by 8
 /// bytes of media, and these by the end of the file or by what was appended.
-bool Planner::isLeftShort(const Atom& atom) {
+bool Planner::isLeftShort(const ContainerItem& atom) {
     if (!atom.isExtended() || atom.size <= s_largestShortSize || total_ - atom.end() < s_shortBy)
         return false;
     const std::string spare = bytesAt(atom.end(), s_shortBy);
@@ -323,55 +273,54 @@ bool Planner::isLeftShort(const Atom& atom) {
 
 /// Whether something that this library appends stands here.
 bool Planner::isAppended(std::uint64_t position) {
-    const auto atom = atomAt(position);
-    if (!atom || !atom->isExtended() ||
-        (atom->type != detail::s_metaDataAtom && atom->type != detail::s_recordingInfoAtom))
+    const auto atom = atoms_.itemAt(position);
+    if (!atom || !isOwn(*atom))
         return false;
-    return atom->size == 0 || (atom->size >= atom->headerSize() && atom->size <= total_ - position);
+    return atom->size == 0 || (atom->size >= atom->headerSize && atom->size <= total_ - position);
 }
 
-void Planner::closeOpenEnd(const Atom& last) {
-    const std::uint64_t length = total_ - last.start;
-    if (!isReadable(last.type) && last.start == 0)
+void Planner::closeOpenEnd(const ContainerItem& last) {
+    const std::uint64_t length = total_ - last.offset;
+    if (!last.type.isPrintable() && last.offset == 0)
         return giveUp(last, "has an open end: the file does not begin like a movie");
     if (isOwn(previous_) && !isFollowedByStrayBytes())
         return giveUp(last, "has an open end, and the metadata before it ends in the middle of a stream");
-    if (!isReadable(last.type))
-        return setStrayBytesAside(last.start);
+    if (!last.type.isPrintable())
+        return setStrayBytesAside(last.offset);
     if (length <= s_largestShortSize) {
         find(last, "has an open end");
-        return change(last.start, text(detail::bigEndianBytes(static_cast<std::uint32_t>(length))),
+        return change(last.offset, text(detail::bigEndianBytes(static_cast<std::uint32_t>(length))),
                       "The atom " + typeText(last.type) + " ends where the file does.");
     }
     if (previous_.type != detail::s_spareAtom || previous_.size != detail::s_atomHeaderSize)
         return giveUp(last, "has an open end, and its " + bytesText(length) +
                                 " do not fit in a 32-bit size; there is no spare 'wide' atom before it");
     find(last, "has an open end");
-    change(previous_.start, text(detail::extendedAtomHeader(last.type, length + previous_.size)),
+    change(previous_.offset, text(detail::extendedAtomHeader(last.type, length + previous_.size)),
            "The atom " + typeText(last.type) +
                " takes in the spare 'wide' atom for a 64-bit size, and ends where the file does.");
 }
 
-void Planner::closeInterruptedAppend(const Atom& last) {
+void Planner::closeInterruptedAppend(const ContainerItem& last) {
     find(last, "was appended, but never given its size");
-    if (last.type == detail::s_metaDataAtom)
+    if (last.holdsMetaData())
         return closeMetaData(last);
-    change(last.sizeField(), text(detail::bigEndianBytes(total_ - last.start)),
+    change(sizeFieldOf(last), text(detail::bigEndianBytes(total_ - last.offset)),
            "The atom " + typeText(last.type) + " ends where the file does.");
 }
 
-void Planner::closeMetaData(const Atom& metaData) {
+void Planner::closeMetaData(const ContainerItem& metaData) {
     const std::uint64_t end = endOfWholeStreams(metaData);
     if (end < total_)
         setAside(end, "an entry that was cut short");
-    change(metaData.sizeField(), text(detail::bigEndianBytes(end - metaData.start)),
+    change(sizeFieldOf(metaData), text(detail::bigEndianBytes(end - metaData.offset)),
            end < total_ ? "The atom 'ZULM' ends after its last whole entry."
                         : "The atom 'ZULM' ends where the file does.");
 }
 
 /// Up to where the atom's children are whole or can be made so; the whole file where that is not certain.
-std::uint64_t Planner::endOfWholeStreams(const Atom& metaData) {
-    std::uint64_t position = metaData.start + metaData.headerSize();
+std::uint64_t Planner::endOfWholeStreams(const ContainerItem& metaData) {
+    std::uint64_t position = metaData.offset + metaData.headerSize;
     while (position < total_) {
         const auto stream = streamAtomAt(position);
         if (!stream) {
@@ -394,12 +343,9 @@ bool Planner::beginsStreamAtom(std::uint64_t position) {
     return left < s_smallestStreamAtom && bytesAt(position, known) == std::string(header.data(), known);
 }
 
-std::uint64_t Planner::endOfTornStream(const Atom& stream) {
-    const std::uint64_t payload = stream.start + stream.headerSize();
-    const auto readPayload = [&](std::uint64_t position, std::span<char> bytes) {
-        return read(payload + position, bytes);
-    };
-    const auto extent = measureStream(readPayload, total_ - payload);
+std::uint64_t Planner::endOfTornStream(const ContainerItem& stream) {
+    const std::uint64_t payload = stream.offset + stream.headerSize;
+    const auto extent = measureStream(atoms_.source().part(payload));
     const std::uint64_t end = payload + (extent ? extent->wholeBytes : 0);
     const bool isFollowed = !extent || streamAtomAt(end);
     lose(!extent      ? "the last stream has no whole header"
@@ -408,7 +354,7 @@ std::uint64_t Planner::endOfTornStream(const Atom& stream) {
                             std::to_string(extent->entries) + (extent->entries == 1 ? " entry" : " entries"));
     if (isFollowed)
         return total_; // its length counts a torn tail that is not there, and more streams follow
-    change(stream.sizeField(), text(detail::bigEndianBytes(end - stream.start)),
+    change(sizeFieldOf(stream), text(detail::bigEndianBytes(end - stream.offset)),
            "The last stream ends after its last whole entry.");
     return end;
 }
@@ -420,19 +366,16 @@ void Planner::setAside(std::uint64_t begin, const std::string& what) {
     const std::string subject = "The bytes of " + what;
     if (count < detail::s_atomHeaderSize)
         return change(begin, {}, subject + " are cut off.");
-    std::string header = text(detail::extendedAtomHeader(detail::s_freeAtom, count));
-    if (count <= s_largestShortSize)
-        header = text(detail::bigEndianBytes(static_cast<std::uint32_t>(count))) +
-                 text(detail::bigEndianBytes(detail::s_freeAtom));
+    std::string header = count > s_largestShortSize
+                             ? text(detail::extendedAtomHeader(detail::s_freeAtom, count))
+                             : text(detail::atomHeader(detail::s_freeAtom, static_cast<std::uint32_t>(count)));
     change(begin, std::move(header), subject + " become a 'free' atom.");
 }
 
 } // namespace
 
-RepairPlan planRepair(std::istream& movie) {
-    RepairPlan plan = Planner(movie).plan();
-    requireReadable(movie);
-    return plan;
+RepairPlan planRepair(const ByteSource& movie) {
+    return Planner(movie).plan();
 }
 
 } // namespace ZULMetaData

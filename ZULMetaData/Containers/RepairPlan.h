@@ -8,9 +8,9 @@
 // nothing if two readings are possible.
 
 #include "../../SharedDependencies/Export.h"
+#include "../ByteSource.h"
 
 #include <cstdint>
-#include <istream>
 #include <string>
 #include <vector>
 
@@ -37,8 +37,8 @@ struct RepairPlan {
     std::string loss;                  ///< what is missing, as a clause about the atom of the finding; else empty
 };
 
-/// Reads the headers of the movie's atoms, and the entries of a stream whose append was interrupted. Clears the
-/// stream's state first. Throws `std::system_error` where reading fails.
-ZULMETADATA_API RepairPlan planRepair(std::istream& movie);
+/// Reads the headers of the movie's atoms, and the entries of a stream whose append was interrupted. Throws
+/// `std::system_error` if reading fails.
+ZULMETADATA_API RepairPlan planRepair(const ByteSource& movie);
 
 } // namespace ZULMetaData

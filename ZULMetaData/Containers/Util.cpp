@@ -12,13 +12,6 @@ namespace ZULMetaData {
 
 namespace {
 
-struct AtomHeader {
-    std::uint64_t start = 0;
-    std::uint64_t size = 0;
-    std::uint32_t type = 0;
-    bool isExtended = false;
-};
-
 bool overwrite(std::fstream& movie, std::uint64_t position, std::span<const char> bytes) {
     seekWritePos(movie, static_cast<std::int64_t>(position));
     movie.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
@@ -29,28 +22,17 @@ bool overwrite(std::fstream& movie, std::uint64_t position, std::span<const char
     return false;
 }
 
-/// Only the 32-bit size 1 announces an extended one here, unlike in the scan.
-bool readHeader(detail::PositionedInput& input, AtomHeader& atom) {
-    std::uint32_t shortSize = 0;
-    atom.start = input.position();
-    if (!input.enoughBytesLeft(detail::s_atomHeaderSize) || !input.readBigEndian(shortSize) ||
-        !input.readBigEndian(atom.type))
-        return false;
-    atom.size = shortSize;
-    atom.isExtended = shortSize == detail::s_extendedSizeMarker;
-    return !atom.isExtended || input.readBigEndian(atom.size);
-}
-
-/// `last` reaches to the end of the movie, `remaining` bytes on, and `previous` stands in front of it.
-bool closeOpenAtom(std::fstream& movie, const AtomHeader& last, const AtomHeader& previous, std::uint64_t remaining) {
-    if (last.isExtended) // what an interrupted append leaves behind
-        return overwrite(movie, last.start + detail::s_extendedSizeOffset, detail::bigEndianBytes(remaining));
+/// `last` reaches to the end of the movie, `remaining` bytes on, and `previous` is the atom before it.
+bool closeOpenAtom(std::fstream& movie, const ContainerItem& last, const ContainerItem& previous,
+                   std::uint64_t remaining) {
+    if (last.isExtended()) // what an interrupted append leaves behind
+        return overwrite(movie, last.offset + detail::s_extendedSizeOffset, detail::bigEndianBytes(remaining));
     if (remaining <= 0xffffffff)
-        return overwrite(movie, last.start, detail::bigEndianBytes(static_cast<std::uint32_t>(remaining)));
+        return overwrite(movie, last.offset, detail::bigEndianBytes(static_cast<std::uint32_t>(remaining)));
     if (previous.size != detail::s_atomHeaderSize || previous.type != detail::s_spareAtom)
         return false;
     // The length stays what it was without the spare bytes that the header now begins in.
-    return overwrite(movie, last.start - detail::s_atomHeaderSize, detail::extendedAtomHeader(last.type, remaining));
+    return overwrite(movie, last.offset - detail::s_atomHeaderSize, detail::extendedAtomHeader(last.type, remaining));
 }
 
 } // namespace
@@ -62,15 +44,14 @@ bool Util::finalizeAtomsInFile(const std::string& path) {
         return false;
     const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(movie));
     detail::PositionedInput input(movie, 0, total);
-    AtomHeader previous;
+    ContainerItem previous;
     while (input.position() < total) {
-        AtomHeader atom;
-        if (!readHeader(input, atom))
+        ContainerItem atom;
+        if (!readAtomHeader(input, detail::ExtendedSizes::Marked, atom))
             return false;
         if (atom.size == 0)
-            return closeOpenAtom(movie, atom, previous, total - atom.start);
-        const std::uint64_t end = atom.start + atom.size;
-        if (end <= atom.start || !input.moveTo(end))
+            return closeOpenAtom(movie, atom, previous, total - atom.offset);
+        if (atom.end() <= atom.offset || !input.moveTo(atom.end()))
             return false;
         previous = atom;
     }

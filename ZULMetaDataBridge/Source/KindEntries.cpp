@@ -2,8 +2,6 @@
 
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 
-#include <utility>
-
 namespace ZULMetaData {
 
 bool isKnownStream(const MetaDataHeader& header) {
@@ -22,10 +20,6 @@ std::uint32_t entrySizeOf(const MetaDataHeader& header) {
         RecordedKinds::visit(header.uuid,
                              [&size]<class Kind>() { size = metaDataFixedEntrySize<typename Kind::Value>(); });
     return size;
-}
-
-StreamEntries entriesOf(ReadBytes read, std::uint64_t length) {
-    return {std::move(read), length};
 }
 
 std::optional<double> timeOfEntry(const MetaDataHeader& header, std::string_view bytes) {

@@ -23,9 +23,6 @@ ZULMETADATA_API bool isDecodable(const MetaDataHeader& header);
 /// kind is not recorded or the version is not known, returns what the header states.
 ZULMETADATA_API std::uint32_t entrySizeOf(const MetaDataHeader& header);
 
-/// Returns the entries as the header divides them. Each is decoded by its kind only if `isDecodable`.
-ZULMETADATA_API StreamEntries entriesOf(ReadBytes read, std::uint64_t length);
-
 /// Returns the time of an entry in seconds. It is empty if the entry does not fit its kind or cannot be decoded.
 ZULMETADATA_API std::optional<double> timeOfEntry(const MetaDataHeader& header, std::string_view bytes);
 

@@ -1,52 +1,46 @@
 #include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 
 #include "ZULMetaData/Containers/ContainerLayout.h"
-#include "ZULMetaData/StreamExtent.h"
 
-#include <algorithm>
 #include <cstdint>
 #include <cstring>
-#include <span>
-#include <vector>
 
 namespace ZULMetaData {
 
 namespace {
 
-/// As far as the file holds them.
-std::string bytesOf(const ReadBytes& read, std::uint64_t total, std::uint64_t begin, std::uint64_t end) {
-    std::string bytes;
-    bytes.resize(static_cast<std::size_t>(std::min(end, total) - std::min(begin, total)));
-    bytes.resize(read(begin, bytes));
+std::string bytesOf(const ByteSource& source) {
+    std::string bytes(static_cast<std::size_t>(source.size()), '\0');
+    bytes.resize(source.read(0, bytes));
     return bytes;
 }
 
-/// What a RIFF file begins with, without any chunk in it.
+constexpr std::size_t s_formSize = 4;
+
+/// Returns what a RIFF file begins with, as a file without any chunk in it. Its size is in 32 bits, whatever it was.
 std::string emptyRIFF(std::string start) {
     constexpr std::size_t sizeOffset = 4;
-    constexpr std::uint32_t formSize = 4;
-    if (start.size() == sizeOffset + sizeof formSize + formSize)
-        std::memcpy(start.data() + sizeOffset, &formSize, sizeof formSize);
+    constexpr std::uint32_t size = s_formSize;
+    if (start.size() == sizeOffset + sizeof size + s_formSize)
+        std::memcpy(start.replace(0, sizeOffset, "RIFF").data() + sizeOffset, &size, sizeof size);
     return start;
 }
 
 } // namespace
 
 std::string metaDataExcerpt(MetaDataParser& recording) {
-    std::istream& stream = recording.getStream();
-    const std::uint64_t total = sizeOfInput(stream);
-    const ReadBytes read = readingFrom(stream);
-    if (recording.getStreamType() == Container::RawStream)
-        return bytesOf(read, total, 0, total);
-    const std::vector<ContainerItem> items = listTopLevel(stream, recording.getStreamType());
-    requireReadable(stream);
+    const ByteSource file = ByteSource::stream(recording.getStream());
+    const Container::Type type = recording.getStreamType();
+    if (type == Container::RawStream)
+        return bytesOf(file);
     std::string excerpt;
-    for (const ContainerItem& item : items) {
-        if (item.type == "RIFF" && item.offset == 0)
-            excerpt += emptyRIFF(bytesOf(read, total, 0, item.headerSize + 4));
-        if (item.type == "ftyp" || item.holdsRecordingInfo() || item.holdsMetaData())
-            excerpt += bytesOf(read, total, item.offset, std::max(item.end(), item.offset));
-        if (recording.getStreamType() == Container::Riff)
+    ItemWalk items(file, type);
+    while (const auto item = items.next()) {
+        if (type == Container::Riff && item->offset == 0)
+            excerpt += emptyRIFF(bytesOf(file.part(0, item->headerSize + s_formSize)));
+        if (item->type == "ftyp" || item->holdsRecordingInfo() || item->holdsMetaData())
+            excerpt += bytesOf(file.part(item->offset, item->size));
+        if (type == Container::Riff)
             excerpt.resize(excerpt.size() + excerpt.size() % 2);
     }
     return excerpt;

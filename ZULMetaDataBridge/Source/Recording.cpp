@@ -1,5 +1,6 @@
 #include "ZULMetaDataBridge/Source/Recording.h"
 
+#include "ZULMetaData/ByteSourceStream.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/MovieDuration.h"
 #include "ZULMetaData/Containers/RecordingInfo.h"
@@ -13,13 +14,6 @@ namespace ZULMetaData {
 
 namespace {
 
-std::unique_ptr<MetaDataParser> recognized(std::istream& input, const std::string& name) {
-    const RecognizedContainer container = recognizeContainer(input, name);
-    if (container.type == Container::Unknown)
-        throw std::runtime_error(container.refusal());
-    return openContainer(input, container.type);
-}
-
 /// Puts the name before the refusal.
 template <class Open>
 std::unique_ptr<MetaDataParser> opened(const std::string& name, Open open) {
@@ -32,57 +26,51 @@ std::unique_ptr<MetaDataParser> opened(const std::string& name, Open open) {
     }
 }
 
+Container::Type recognizedType(const ByteSource& bytes, const std::string& name) {
+    const RecognizedContainer recognized = recognizeContainer(bytes, name);
+    if (recognized.type == Container::Unknown)
+        throw std::runtime_error(recognized.refusal());
+    return recognized.type;
+}
+
+/// Names the file in every error.
+ByteSource named(const ByteSource& bytes, const std::string& name) {
+    return {bytes.size(), [bytes, name](std::uint64_t position, std::span<char> to) {
+                return orFileError(name, [&] { return bytes.read(position, to); });
+            }};
+}
+
 } // namespace
 
 Recording::Recording(const FileLocation& file, std::string name)
     : path_(utf8Path(file)), name_(name.empty() ? path_ : std::move(name)),
-      parser_(opened(name_, [this] { return openContainer(path_); })) {
-    requireRead();
+      parser_(opened(name_, [this] { return openContainer(path_); })),
+      bytes_(orFileError(name_, [this] { return named(ByteSource::stream(parser_->getStream()), name_); })) {}
+
+Recording::Recording(ByteSource bytes, std::string name)
+    : name_(std::move(name)), input_(std::make_unique<ByteSourceStream>(bytes)),
+      parser_(opened(name_, [&] { return openContainer(*input_, recognizedType(bytes, name_)); })),
+      bytes_(named(bytes, name_)) {}
+
+std::optional<double> Recording::duration() const {
+    return movieDuration(bytes_, container());
 }
 
-Recording::Recording(std::istream& input, std::string name)
-    : name_(std::move(name)), parser_(opened(name_, [&] { return recognized(input, name_); })) {
-    requireRead();
-}
-
-void Recording::requireRead() {
-    orFileError(name_, [this] { requireReadable(input()); });
-}
-
-std::uint64_t Recording::size() {
-    return orFileError(name_, [this] { return sizeOfInput(input()); });
-}
-
-ReadBytes Recording::bytes() {
-    return [read = readingFrom(input()), name = name_](std::uint64_t position, std::span<char> bytes) {
-        return orFileError(name, [&] { return read(position, bytes); });
-    };
-}
-
-std::optional<double> Recording::duration() {
-    const auto duration = orFileError(name_, [this] { return movieDuration(*parser_); });
-    requireRead();
-    return duration;
-}
-
-std::vector<ZCAPHeader> Recording::creators() {
-    auto creators = orFileError(name_, [this] { return readRecordingInfo(*parser_); });
-    requireRead();
-    return creators;
+std::vector<ZCAPHeader> Recording::creators() const {
+    return readRecordingInfo(bytes_, container());
 }
 
 const ValidationReport& Recording::validation() {
     if (!validation_)
-        validation_ = orFileError(name_, [this] { return validateRecording(input(), container()); });
+        validation_ = validateRecording(bytes_, container());
     return *validation_;
 }
 
-std::vector<StreamInfo> Recording::streams() {
-    const std::uint64_t total = size();
+std::vector<StreamInfo> Recording::streams() const {
     std::vector<StreamInfo> streams;
     for (const uuid& type : parser_->getAvailableMetaDataUUIDs()) {
         const auto [offset, length] = parser_->fileDataForUUID(type);
-        streams.push_back({type, offset, length, std::min(length, total - std::min(offset, total))});
+        streams.push_back({type, offset, length, bytes_.part(offset, length).size()});
     }
     return streams;
 }
@@ -114,13 +102,6 @@ std::vector<StreamReport> Recording::hiddenStreams() {
             hidden.push_back(stream);
     }
     return hidden;
-}
-
-StreamEntries Recording::entriesOf(const StreamInfo& stream) {
-    const auto read = [read = bytes(), offset = stream.offset](std::uint64_t position, std::span<char> bytes) {
-        return read(offset + position, bytes);
-    };
-    return ZULMetaData::entriesOf(read, stream.presentBytes);
 }
 
 } // namespace ZULMetaData

@@ -104,11 +104,11 @@ private:
     void writeMedia(std::ostream& out);
     void writeBlank(std::ostream& out, const ContainerItem& item) const;
 
-    std::istream& recording_;
     RecordingRedaction redaction_;
     Progress progress_;
     std::unique_ptr<MetaDataParser> parser_;
-    std::uint64_t total_ = 0;
+    ByteSource file_;
+    std::uint64_t total_;
     std::vector<detail::StreamPart> streams_;
     std::vector<ContainerItem> items_; ///< at the top level
     detail::MediaPlaces media_;
@@ -124,20 +124,15 @@ private:
 
 RecordingRedactor::Work::Work(std::istream& recording, Container::Type type, RecordingRedaction redaction,
                               Progress progress)
-    : recording_(recording), redaction_(std::move(redaction)), progress_(std::move(progress)),
-      parser_(openContainer(recording, type)) {
+    : redaction_(std::move(redaction)), progress_(std::move(progress)), parser_(openContainer(recording, type)),
+      file_(ByteSource::stream(recording)), total_(file_.size()) {
     if (!progress_)
         progress_ = [](Step, std::uint64_t, std::uint64_t) {};
-    if (!parser_)
-        throw RedactionError(Reason::Damaged, "cannot be read");
-    requireReadable(recording_);
-    total_ = sizeOfInput(recording_);
-    streams_ = detail::streamsIn(*parser_);
-    items_ = listTopLevel(recording_, container());
-    requireReadable(recording_);
-    media_ = detail::placesIn(*parser_);
+    streams_ = detail::streamsIn(*parser_, file_);
+    items_ = topLevelItems(file_, container());
+    media_ = detail::placesIn(file_, container());
     choosePlaces();
-    mediaCopy_.emplace(readingFrom(recording_), blanks_);
+    mediaCopy_.emplace(file_, blanks_);
 }
 
 void RecordingRedactor::Work::addPlace(RedactedPlace::Reason reason, const detail::MediaPlace& place) {
@@ -166,17 +161,18 @@ void RecordingRedactor::Work::choosePlaces() {
 void RecordingRedactor::Work::chooseCreator() {
     const ZCAPHeader info = detail::neutralRecordingInfo();
     const std::string neutral(reinterpret_cast<const char*>(&info), sizeof info);
-    const ReadBytes read = readingFrom(recording_);
     for (const ContainerItem& item : items_) {
         if (!item.holdsRecordingInfo())
             continue;
         std::string head = item.payloadSize() >= neutral.size() ? neutral : std::string();
         std::string stored(head.size(), '\0');
-        read(item.payloadOffset(), stored);
+        file_.read(item.payloadOffset(), stored);
         if (item.payloadSize() > 0 && (stored != head || item.payloadSize() != head.size()))
-            addPlace(
-                RedactedPlace::Creator,
-                {{}, item.type, item.offset, item.size, {{item.payloadOffset(), item.payloadSize(), std::move(head)}}});
+            addPlace(RedactedPlace::Creator, {{},
+                                              item.type.text(),
+                                              item.offset,
+                                              item.size,
+                                              {{item.payloadOffset(), item.payloadSize(), std::move(head)}}});
     }
 }
 
@@ -205,14 +201,14 @@ void RecordingRedactor::Work::collectTexts() {
         };
     if (!redaction_.removesCreator)
         return;
-    for (const ZCAPHeader& info : readRecordingInfo(*parser_))
+    for (const ZCAPHeader& info : readRecordingInfo(file_, container()))
         for (const std::string& text : {info.creator.name(), info.creator.version(), info.creator.platformVersion()})
             if (!text.empty() && text != CreatorAttributes::platformNameMac())
                 texts_.removed.insert(text);
 }
 
 void RecordingRedactor::Work::requireWholeContainer() {
-    const RepairPlan plan = isMovie() ? planRepair(recording_) : RepairPlan();
+    const RepairPlan plan = isMovie() ? planRepair(file_) : RepairPlan();
     if (plan.state == RepairPlan::Repairable)
         throw RedactionError(Reason::Repairable, plan.finding);
     const std::uint64_t end = items_.empty() ? 0 : items_.back().end();
@@ -223,8 +219,7 @@ void RecordingRedactor::Work::requireWholeContainer() {
 
 /// A stream in a place that is copied as it is would stay in the copy.
 void RecordingRedactor::Work::requireNothingMisplaced() {
-    StreamSalvage salvage(recording_, container(),
-                          [this](std::uint64_t done) { progress_(Step::Searching, done, total_); });
+    StreamSalvage salvage(file_, container(), [this](std::uint64_t done) { progress_(Step::Searching, done, total_); });
     const SalvageReport report = salvage.run();
     if (report.hasMore)
         throw RedactionError(Reason::MisplacedStream,
@@ -277,7 +272,7 @@ RedactedRecording RecordingRedactor::Work::write(const FileLocation& copy) {
     fileOpen(written, utf8Path(copy).c_str(), std::ios::binary);
     if (!written.is_open())
         throw RedactionError(Reason::CannotWrite, std::string("cannot be read back: ") + std::strerror(errno));
-    const std::uint64_t size = sizeOfInput(written);
+    const std::uint64_t size = ByteSource::stream(written).size();
     std::uint64_t done = 0;
     check_->requireClean(written, container(), [&](std::uint64_t bytes) {
         done += bytes;
@@ -288,7 +283,7 @@ RedactedRecording RecordingRedactor::Work::write(const FileLocation& copy) {
 
 RedactedStream RecordingRedactor::Work::redact(const detail::StreamPart& stream, std::ostream& out) const {
     RedactedStream redacted = redactStream(stream.bytes, streamRedaction_, out);
-    redacted.bytesLeftOut += stream.declared - stream.bytes.length;
+    redacted.bytesLeftOut += stream.declared - stream.bytes.size();
     redacted.header.uuid = stream.type;
     return redacted;
 }
@@ -334,7 +329,7 @@ std::vector<RedactedStream> RecordingRedactor::Work::writeMovieMetaData(std::ost
 std::vector<RedactedStream> RecordingRedactor::Work::writeRIFFMetaData(std::ostream& out) const {
     std::vector<RedactedStream> streams;
     const std::uint64_t begin = offsetOf(out);
-    const auto writeHeader = [&out](std::uint64_t offset, std::uint32_t type) {
+    const auto writeHeader = [&out](std::uint64_t offset, FourCC type) {
         const std::uint64_t size = offsetOf(out) - offset - detail::s_chunkHeaderSize;
         if (size > s_most32)
             throw RedactionError(Reason::TooLarge,

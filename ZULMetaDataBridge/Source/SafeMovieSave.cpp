@@ -1,21 +1,18 @@
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
+#include "ZULMetaData/ByteSourceStream.h"
 #include "ZULMetaData/Containers/AtomFormat.h"
-#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/RecordingInfo.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
-#include "ZULMetaDataBridge/Source/MovieTransaction.h"
+#include "ZULMetaDataBridge/Source/MovieFile.h"
 #include "ZULMetaDataBridge/Source/ZULRAtomWriter.h"
 
 #include <algorithm>
-#include <array>
-#include <cerrno>
 #include <cstring>
-#include <fstream>
-#include <memory>
 #include <optional>
+#include <span>
 #include <system_error>
 #include <utility>
 
@@ -25,19 +22,10 @@ namespace {
 
 constexpr std::size_t s_pieceSize = 1 << 18;
 
-std::ifstream openMovie(const FileLocation& movie) {
-    std::ifstream file;
-    errno = 0;
-    fileOpen(file, utf8Path(movie).c_str(), std::ios_base::binary);
-    if (!file.is_open())
-        throw SaveError(utf8Path(movie), std::string("cannot be opened: ") + std::strerror(errno));
-    return file;
-}
-
 /// An empty file may yet become a movie; `repair` refuses it in words of its own.
-void requireMovie(std::ifstream& file, const FileLocation& movie) {
+void requireMovie(const ByteSource& file, const FileLocation& movie) {
     const RecognizedContainer recognized = recognizeContainer(file, utf8Path(movie));
-    if (recognized.type == Container::QuickTime || sizeOfInput(file) == 0)
+    if (recognized.type == Container::QuickTime || file.size() == 0)
         return;
     throw SaveError(utf8Path(movie), recognized.type == Container::Unknown ? recognized.refusal()
                                      : recognized.type == Container::Riff
@@ -45,14 +33,19 @@ void requireMovie(std::ifstream& file, const FileLocation& movie) {
                                          : "is a stream file by its contents, not a movie");
 }
 
-std::unique_ptr<MetaDataParser> parserOver(std::ifstream& movie) {
-    return MetaDataParser::create(movie, Container::QuickTime);
-}
+/// Returns the streams that readers find in a movie.
+class FoundStreams {
+public:
+    explicit FoundStreams(const ByteSource& movie)
+        : stream_(movie), parser_(MetaDataParser::create(stream_, Container::QuickTime)) {
+        requireReadable(stream_);
+    }
 
-/// A stream that was found worth attaching.
-struct Candidate {
-    AttachedStream stream;
-    StreamSource::Bytes source;
+    MetaDataParser::CachedFileData placeOf(const uuid& type) const { return parser_->fileDataForUUID(type); }
+
+private:
+    ByteSourceStream stream_;
+    std::unique_ptr<MetaDataParser> parser_;
 };
 
 /// What makes a source doubtful; empty if nothing does.
@@ -71,65 +64,31 @@ std::string doubtAbout(const StreamExtent& extent, std::uint64_t length) {
     return {};
 }
 
-Candidate examine(const StreamSource& source, SafeMovieSave::Sources sources) {
-    Candidate candidate{{}, source.open()};
-    const auto extent = measureStream(candidate.source.read, candidate.source.length);
+AttachPlan::Stream measured(const StreamSource& source) {
+    const ByteSource bytes = source.open();
+    const auto extent = measureStream(bytes);
     if (!extent)
-        throw SaveError(source.name(), "too short for a stream: " + std::to_string(candidate.source.length) +
-                                           " bytes of a " + std::to_string(s_metaDataHeaderSize) + "-byte header");
-    if (sources == SafeMovieSave::Sources::Checked)
-        if (const std::string doubt = doubtAbout(*extent, candidate.source.length); !doubt.empty())
+        throw SaveError(source.name(), "too short for a stream: " + std::to_string(bytes.size()) + " bytes of a " +
+                                           std::to_string(s_metaDataHeaderSize) + "-byte header");
+    if (source.isChecked())
+        if (const std::string doubt = doubtAbout(*extent, bytes.size()); !doubt.empty())
             throw SaveError(source.name(), doubt, SaveError::Reason::Doubtful);
-    candidate.stream = {source.name(),      extent->header.uuid, 0,
-                        extent->wholeBytes, extent->entries,     candidate.source.length - extent->wholeBytes,
-                        extent->end};
-    return candidate;
-}
-
-std::vector<Candidate> examine(const FileLocation& movie, const std::vector<StreamSource>& sources,
-                               SafeMovieSave::Sources which) {
-    if (sources.empty())
-        throw SaveError(utf8Path(movie), "there are no streams to attach");
-    std::vector<Candidate> candidates;
-    for (const StreamSource& source : sources) {
-        try {
-            candidates.push_back(examine(source, which));
-        } catch (const std::system_error& error) {
-            throw SaveError(source.name(), error.what());
-        }
-        const auto& added = candidates.back().stream;
-        const auto first = std::find_if(candidates.begin(), candidates.end(),
-                                        [&](const auto& candidate) { return candidate.stream.type == added.type; });
-        if (&first->stream != &added)
-            throw SaveError(added.name, "a second stream of the kind " + metaDataKindName(added.type) + ", beside " +
-                                            first->stream.name);
-    }
-    return candidates;
-}
-
-void refuseExisting(const FileLocation& path, const std::vector<Candidate>& candidates) {
-    std::ifstream movie = openMovie(path);
-    const auto parser = parserOver(movie);
-    for (const Candidate& candidate : candidates)
-        if (const auto range = parser->fileDataForUUID(candidate.stream.type); range.offset != 0)
-            throw SaveError(utf8Path(path),
-                            "has a stream of the kind " + metaDataKindName(candidate.stream.type) +
-                                " already, at offset " + std::to_string(range.offset),
-                            SaveError::Reason::KindExists);
+    return {{source.name(), extent->header.uuid, 0, extent->wholeBytes, extent->entries,
+             bytes.size() - extent->wholeBytes, extent->end},
+            bytes};
 }
 
 /// One save of one movie, from its repair to what is read back.
 class Save {
 public:
     Save(const FileLocation& movie, const SafeMovieSave::Progress& progress)
-        : movie_(movie), progress_(progress), transaction_(movie) {}
+        : name_(utf8Path(movie)), progress_(progress), file_(movie), movie_(movie) {}
 
     RepairPlan repair();
-    AttachResult attach(std::vector<Candidate>& candidates, SafeMovieSave::Existing existing,
-                        SafeMovieSave::FragmentIndex index);
+    AttachResult attach(const AttachPlan& plan, SafeMovieSave::FragmentIndex index);
     StampResult stamp(const ZCAPHeader& info, SafeMovieSave::FragmentIndex index);
 
-    /// Runs `work`, and undoes what it did where it throws.
+    /// Runs `work`, and undoes what it did if it throws.
     template <class Work>
     auto orUndo(Work work) {
         try {
@@ -145,131 +104,100 @@ public:
 
 private:
     [[noreturn]] void fail(const std::string& sentence, SaveError::Reason reason = SaveError::Reason::Failed) const {
-        throw SaveError(utf8Path(movie_), sentence, reason);
+        throw SaveError(name_, sentence, reason);
     }
 
-    void write(Candidate& candidate);
-    void verify(const std::vector<Candidate>& candidates);
-    void compare(std::ifstream& movie, const Candidate& candidate);
-    void read(const Candidate& candidate, std::uint64_t position, std::span<char> bytes) const;
+    AttachedStream append(const AttachPlan::Stream& stream);
+    void verify(const AttachedStream& written, const ByteSource& bytes, const FoundStreams& found);
     FragmentIndexState treat(SafeMovieSave::FragmentIndex index);
     void moveToEnd(const ContainerItem& index);
     void undo(const char* reason);
-    void advance(std::uint64_t bytes);
 
-    FileLocation movie_;
+    /// Calls `visit` with every piece of a source and its position. Throws `SaveError` if the source ends early.
+    template <class Visit>
+    void inPieces(const ByteSource& source, std::uint64_t size, const std::string& name, Visit visit);
+
+    std::string name_;
     SafeMovieSave::Progress progress_;
-    MovieTransaction transaction_;
+    MovieFile file_;
+    FileLocation movie_;
     std::uint64_t done_ = 0;
     std::uint64_t total_ = 0;
 };
 
 RepairPlan Save::repair() {
-    std::ifstream movie = openMovie(movie_);
+    const ByteSource movie = file_.bytes();
     requireMovie(movie, movie_);
     RepairPlan plan = planRepair(movie);
-    if (transaction_.end() == 0)
+    if (movie.size() == 0)
         fail("is empty");
     if (plan.state == RepairPlan::Unrepairable)
         fail(plan.finding);
-    transaction_.apply(plan.changes);
+    file_.apply(plan.changes);
     return plan;
 }
 
-void Save::advance(std::uint64_t bytes) {
-    done_ += bytes;
-    if (progress_)
-        progress_(done_, total_);
-}
-
-void Save::read(const Candidate& candidate, std::uint64_t position, std::span<char> bytes) const {
-    if (candidate.source.read(position, bytes) != bytes.size())
-        throw SaveError(candidate.stream.name, "cannot be read at offset " + std::to_string(position));
-}
-
-/// Calls `visit` with the position and size of every piece of a stream.
 template <class Visit>
-void inPieces(std::uint64_t length, Visit visit) {
-    for (std::uint64_t position = 0; position < length; position += s_pieceSize)
-        visit(position, static_cast<std::size_t>(std::min<std::uint64_t>(s_pieceSize, length - position)));
-}
-
-void Save::write(Candidate& candidate) {
-    const std::uint64_t length = candidate.stream.bytes;
-    transaction_.append(detail::extendedAtomHeader(detail::s_streamAtom, detail::s_extendedAtomHeaderSize + length));
-    candidate.stream.offset = transaction_.end();
+void Save::inPieces(const ByteSource& source, std::uint64_t size, const std::string& name, Visit visit) {
     std::vector<char> piece(s_pieceSize);
-    inPieces(length, [&](std::uint64_t position, std::size_t size) {
-        const std::span<char> bytes(piece.data(), size);
-        read(candidate, position, bytes);
-        transaction_.append(bytes);
-        advance(size);
-    });
-}
-
-void Save::compare(std::ifstream& movie, const Candidate& candidate) {
-    const ReadBytes readMovie = readingFrom(movie);
-    std::vector<char> expected(s_pieceSize);
-    std::vector<char> found(s_pieceSize);
-    inPieces(candidate.stream.bytes, [&](std::uint64_t position, std::size_t size) {
-        read(candidate, position, {expected.data(), size});
-        if (readMovie(candidate.stream.offset + position, {found.data(), size}) != size ||
-            std::memcmp(expected.data(), found.data(), size) != 0)
-            fail("does not hold what was written at offset " + std::to_string(candidate.stream.offset + position));
-        advance(size);
-    });
-}
-
-void Save::verify(const std::vector<Candidate>& candidates) {
-    std::ifstream movie = openMovie(movie_);
-    const auto parser = parserOver(movie);
-    for (const Candidate& candidate : candidates) {
-        const auto range = parser->fileDataForUUID(candidate.stream.type);
-        requireReadable(movie);
-        if (range.offset != candidate.stream.offset || range.length != candidate.stream.bytes)
-            fail("does not show its stream of the kind " + metaDataKindName(candidate.stream.type) + " at offset " +
-                 std::to_string(candidate.stream.offset) + " to a reader");
-        compare(movie, candidate);
+    for (std::uint64_t position = 0; position < size; position += piece.size()) {
+        piece.resize(static_cast<std::size_t>(std::min<std::uint64_t>(s_pieceSize, size - position)));
+        if (source.read(position, piece) != piece.size())
+            throw SaveError(name, "cannot be read at offset " + std::to_string(position));
+        visit(position, std::span<char>(piece));
+        done_ += piece.size();
+        if (progress_)
+            progress_(done_, total_);
     }
 }
 
-/// Puts a copy at the end of the file, and then takes the old one's type away. If the program ends before it has, both
-/// are good.
-void Save::moveToEnd(const ContainerItem& index) {
-    std::ifstream movie = openMovie(movie_);
-    const ReadBytes readMovie = readingFrom(movie);
-    const std::uint64_t start = transaction_.end();
-    std::vector<char> piece(s_pieceSize);
-    inPieces(index.size, [&](std::uint64_t position, std::size_t size) {
-        const std::span<char> bytes(piece.data(), size);
-        if (readMovie(index.offset + position, bytes) != size)
-            fail("cannot be read at offset " + std::to_string(index.offset + position));
-        if (position == 0) // open-ended until it is whole
-            std::copy_n(detail::atomHeader(detail::s_freeAtom, 0).begin(), detail::s_atomHeaderSize, bytes.begin());
-        transaction_.append(bytes);
+AttachedStream Save::append(const AttachPlan::Stream& stream) {
+    AttachedStream written = stream.stream;
+    file_.append(detail::extendedAtomHeader(detail::s_streamAtom, detail::s_extendedAtomHeaderSize + written.bytes));
+    written.offset = file_.end();
+    inPieces(stream.bytes, written.bytes, written.name,
+             [&](std::uint64_t, std::span<const char> piece) { file_.append(piece); });
+    return written;
+}
+
+void Save::verify(const AttachedStream& written, const ByteSource& bytes, const FoundStreams& found) {
+    const auto place = found.placeOf(written.type);
+    if (place.offset != written.offset || place.length != written.bytes)
+        fail("does not show its stream of the kind " + metaDataKindName(written.type) + " at offset " +
+             std::to_string(written.offset) + " to a reader");
+    const ByteSource movie = file_.bytes();
+    std::vector<char> stored(s_pieceSize);
+    inPieces(bytes, written.bytes, written.name, [&](std::uint64_t position, std::span<const char> piece) {
+        const std::uint64_t offset = written.offset + position;
+        if (movie.read(offset, std::span(stored).first(piece.size())) != piece.size() ||
+            std::memcmp(piece.data(), stored.data(), piece.size()) != 0)
+            fail("does not hold what was written at offset " + std::to_string(offset));
     });
-    transaction_.sync();
-    transaction_.writeAppended(start, detail::atomHeader(detail::s_fragmentIndexAtom, index.sizeField));
-    const std::uint64_t type = index.offset + sizeof index.sizeField;
-    const auto name = [](std::uint32_t code) {
-        const auto bytes = detail::bigEndianBytes(code);
-        return std::string(bytes.begin(), bytes.end());
-    };
-    transaction_.apply({{type, name(detail::s_fragmentIndexAtom), name(detail::s_freeAtom),
-                         "The old index of the fragments becomes a 'free' atom."}});
+}
+
+/// Puts a copy at the end of the file, and then takes the type of the old one away. If the program ends in between,
+/// both are good.
+void Save::moveToEnd(const ContainerItem& index) {
+    const std::uint64_t start = file_.end();
+    total_ += index.size;
+    const ByteSource old = file_.bytes().part(index.offset, index.size);
+    inPieces(old, index.size, name_, [&](std::uint64_t position, std::span<char> piece) {
+        if (position == 0) // open-ended until it is whole
+            std::copy_n(detail::atomHeader(detail::s_freeAtom, 0).begin(), detail::s_atomHeaderSize, piece.begin());
+        file_.append(piece);
+    });
+    file_.sync();
+    file_.writeAppended(start, detail::atomHeader(detail::s_fragmentIndexAtom, index.sizeField));
+    file_.apply({{index.offset + sizeof index.sizeField, detail::s_fragmentIndexAtom.text(), detail::s_freeAtom.text(),
+                  "The old index of the fragments becomes a 'free' atom."}});
 }
 
 FragmentIndexState Save::treat(SafeMovieSave::FragmentIndex index) {
     std::optional<ContainerItem> found;
-    {
-        std::ifstream movie = openMovie(movie_);
-        visitTopLevel(movie, Container::QuickTime, [&](const ContainerItem& item) {
-            if (item.type == "mfra")
-                found = item;
-            return true;
-        });
-        requireReadable(movie);
-    }
+    ItemWalk atoms(file_.bytes(), Container::QuickTime);
+    while (const auto atom = atoms.next())
+        if (atom->type == detail::s_fragmentIndexAtom)
+            found = atom;
     if (!found)
         return FragmentIndexState::Absent;
     if (index == SafeMovieSave::FragmentIndex::Leave)
@@ -278,33 +206,29 @@ FragmentIndexState Save::treat(SafeMovieSave::FragmentIndex index) {
     return FragmentIndexState::AtEnd;
 }
 
-AttachResult Save::attach(std::vector<Candidate>& candidates, SafeMovieSave::Existing existing,
-                          SafeMovieSave::FragmentIndex index) {
+AttachResult Save::attach(const AttachPlan& plan, SafeMovieSave::FragmentIndex index) {
     AttachResult result{repair(), {}, FragmentIndexState::Absent};
-    if (existing == SafeMovieSave::Existing::Refuse)
-        refuseExisting(movie_, candidates);
-    for (const Candidate& candidate : candidates)
-        total_ += 2 * candidate.stream.bytes; // written, and read back
-    transaction_.beginAtom(detail::s_metaDataAtom);
-    for (Candidate& candidate : candidates)
-        write(candidate);
-    transaction_.endAtom();
+    plan.requireFor(file_.bytes(), name_);
+    for (const auto& [stream, bytes] : plan.streams())
+        total_ += 2 * stream.bytes; // written, and read back
+    file_.beginAtom(detail::s_metaDataAtom);
+    for (const AttachPlan::Stream& stream : plan.streams())
+        result.streams.push_back(append(stream));
+    file_.endAtom();
     result.fragmentIndex = treat(index);
-    verify(candidates);
-    for (Candidate& candidate : candidates)
-        result.streams.push_back(std::move(candidate.stream));
+    const FoundStreams found(file_.bytes());
+    for (std::size_t i = 0; i < result.streams.size(); ++i)
+        verify(result.streams[i], plan.streams()[i].bytes, found);
     return result;
 }
 
 StampResult Save::stamp(const ZCAPHeader& info, SafeMovieSave::FragmentIndex index) {
     StampResult result{repair(), {}, FragmentIndexState::Absent};
-    transaction_.beginAtom(detail::s_recordingInfoAtom);
-    transaction_.append({reinterpret_cast<const char*>(&info), sizeof info});
-    transaction_.endAtom();
+    file_.beginAtom(detail::s_recordingInfoAtom);
+    file_.append({reinterpret_cast<const char*>(&info), sizeof info});
+    file_.endAtom();
     result.fragmentIndex = treat(index);
-    std::ifstream movie = openMovie(movie_);
-    const auto infos = readRecordingInfo(*parserOver(movie));
-    requireReadable(movie);
+    const auto infos = readRecordingInfo(file_.bytes(), Container::QuickTime);
     if (infos.empty() || std::memcmp(&infos.back(), &info, sizeof info) != 0)
         fail("does not show its recording info to a reader");
     result.info = infos.back();
@@ -313,52 +237,73 @@ StampResult Save::stamp(const ZCAPHeader& info, SafeMovieSave::FragmentIndex ind
 
 void Save::undo(const char* reason) {
     try {
-        transaction_.undo();
+        file_.undo();
     } catch (const std::system_error& error) {
         fail(std::string(reason) + "; and it could not be made what it was: " + error.what(),
              SaveError::Reason::NotUndone);
     }
 }
 
-/// Names the movie where the platform does not.
+/// Runs `work` and adds the name to errors of the platform.
 template <class Work>
-auto save(const FileLocation& movie, const SafeMovieSave::Progress& progress, Work work) {
+auto naming(const std::string& name, Work work) {
     try {
-        return Save(movie, progress).orUndo(work);
+        return work();
     } catch (const std::system_error& error) {
-        throw SaveError(utf8Path(movie), error.what());
+        throw SaveError(name, error.what());
     }
 }
 
+template <class Work>
+auto save(const FileLocation& movie, const SafeMovieSave::Progress& progress, Work work) {
+    return naming(utf8Path(movie), [&] { return Save(movie, progress).orUndo(work); });
+}
+
 } // namespace
+
+AttachPlan::AttachPlan(const std::vector<StreamSource>& streams, ExistingStreams existing) : existing_(existing) {
+    for (const StreamSource& source : streams) {
+        streams_.push_back(naming(source.name(), [&] { return measured(source); }));
+        const AttachedStream& added = streams_.back().stream;
+        const auto first = std::find_if(streams_.begin(), streams_.end(),
+                                        [&](const Stream& other) { return other.stream.type == added.type; });
+        if (&first->stream != &added)
+            throw SaveError(added.name, "a second stream of the kind " + metaDataKindName(added.type) + ", beside " +
+                                            first->stream.name);
+    }
+}
+
+void AttachPlan::requireFor(const ByteSource& movie, const std::string& name) const {
+    if (streams_.empty())
+        throw SaveError(name, "there are no streams to attach");
+    if (existing_ == ExistingStreams::Supersede)
+        return;
+    const FoundStreams found(movie);
+    for (const auto& [stream, bytes] : streams_)
+        if (const auto place = found.placeOf(stream.type); place.offset != 0)
+            throw SaveError(name,
+                            "has a stream of the kind " + metaDataKindName(stream.type) + " already, at offset " +
+                                std::to_string(place.offset),
+                            SaveError::Reason::KindExists);
+}
 
 SafeMovieSave::SafeMovieSave(FileLocation movie, Progress progress)
     : movie_(std::move(movie)), progress_(std::move(progress)) {}
 
 RepairPlan SafeMovieSave::plan() const {
-    std::ifstream movie = openMovie(movie_);
-    try {
+    return naming(utf8Path(movie_), [this] {
+        const ByteSource movie = ByteSource::file(utf8Path(movie_));
         requireMovie(movie, movie_);
         return planRepair(movie);
-    } catch (const std::system_error& error) {
-        throw SaveError(utf8Path(movie_), error.what());
-    }
+    });
 }
 
 RepairPlan SafeMovieSave::repair() const {
     return save(movie_, progress_, [](Save& work) { return work.repair(); });
 }
 
-AttachResult SafeMovieSave::attach(const std::vector<StreamSource>& streams, Existing existing, Sources sources,
-                                   FragmentIndex index) const {
-    std::vector<Candidate> candidates = examine(movie_, streams, sources);
-    return save(movie_, progress_, [&](Save& work) { return work.attach(candidates, existing, index); });
-}
-
-void SafeMovieSave::checkAttach(const std::vector<StreamSource>& streams, Existing existing, Sources sources) const {
-    const std::vector<Candidate> candidates = examine(movie_, streams, sources);
-    if (existing == Existing::Refuse)
-        refuseExisting(movie_, candidates);
+AttachResult SafeMovieSave::attach(const AttachPlan& plan, FragmentIndex index) const {
+    return save(movie_, progress_, [&](Save& work) { return work.attach(plan, index); });
 }
 
 StampResult SafeMovieSave::stamp(const std::string& creatorName, const std::string& creatorVersion,

@@ -10,8 +10,9 @@
 #include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
 #include "../../SharedDependencies/ZCAPHeader.h"
+#include "../../ZULMetaData/ByteSource.h"
 #include "../../ZULMetaData/Containers/RepairPlan.h"
-#include "../../ZULMetaData/StreamExtent.h"
+#include "../../ZULMetaData/StreamEntries.h"
 #include "StreamSource.h"
 
 #include <cstdint>
@@ -29,7 +30,7 @@ public:
         Failed,     ///< the movie is what it was
         KindExists, ///< so it is, and has a stream of that kind already
         NotUndone,  ///< the operation failed, and the movie could not be made what it was
-        Doubtful,   ///< the movie is what it was: a source does not look like a stream, see `SafeMovieSave::Sources`
+        Doubtful,   ///< the movie is what it was: a source does not look like a stream, see `StreamSource::unchecked`
     };
 
     /// `what()` gives both: the file, a colon and the sentence.
@@ -79,6 +80,34 @@ struct StampResult {
     FragmentIndexState fragmentIndex = FragmentIndexState::Absent; ///< see `SafeMovieSave::FragmentIndex`
 };
 
+/// What to do about streams of kinds that the movie has already. Readers take the last one; the others would stay in
+/// the file, unread.
+enum class ExistingStreams { Refuse, Supersede };
+
+/// Streams that were examined and are worth attaching, to one movie or to a copy of it.
+class ZULMETADATA_API AttachPlan {
+public:
+    /// Measures every stream. Throws `SaveError` if a stream cannot be read, if one has no header, if two are of one
+    /// kind, and if a source that is checked does not look like a stream.
+    explicit AttachPlan(const std::vector<StreamSource>& streams, ExistingStreams existing = ExistingStreams::Refuse);
+
+    /// Throws `SaveError` if there is no stream, or if the movie has a stream of a kind that must not be there. Changes
+    /// nothing; `SafeMovieSave::attach` does this once more when nobody else can change the movie. `name` is for
+    /// messages.
+    void requireFor(const ByteSource& movie, const std::string& name) const;
+
+    /// One stream as it was measured.
+    struct Stream {
+        AttachedStream stream; ///< without a place in a movie
+        ByteSource bytes;
+    };
+    const std::vector<Stream>& streams() const { return streams_; } ///< returns them in the order of the sources
+
+private:
+    std::vector<Stream> streams_;
+    ExistingStreams existing_;
+};
+
 /// Every operation takes the file for what `recognizeContainer` says and throws `SaveError` if it is no movie. It then
 /// repairs the movie as `planRepair` says, and throws `SaveError` if that cannot be done.
 /// What it appends reaches the disk before its size does, and is read back. Where anything fails, the repair included,
@@ -89,19 +118,12 @@ struct StampResult {
 /// The movie is locked against other programs that use this class. Needs about a megabyte, whatever the streams hold.
 class ZULMETADATA_API SafeMovieSave {
 public:
-    /// What to do about streams of kinds that the movie has already. Readers take the last one; the others would stay
-    /// in the file, unread.
-    enum class Existing { Refuse, Supersede };
+    using Existing = ExistingStreams;
 
     /// What to do about an index of fragments, which is no longer at the end of the file once something is appended.
     /// Players that use one then take longer to find a time. `MoveToEnd` copies it to the end and turns the old one
     /// into a `free` atom.
     enum class FragmentIndex { Leave, MoveToEnd };
-
-    /// Which sources are attached. A checked source is a stream of a registered kind and version that holds at least
-    /// one whole entry, or nothing after its header. Anything else is often a wrong path, whose first 24 bytes would
-    /// pass for a header.
-    enum class Sources { Checked, Unchecked };
 
     /// Called now and then with the bytes that were written or read back. What it throws ends and undoes the
     /// operation.
@@ -116,14 +138,14 @@ public:
     RepairPlan repair() const;
 
     /// Appends the streams as one atom, in this order. Bytes after the last whole entry of a stream are left out.
-    /// Throws if there is no stream, if two are of one kind, if one has no header, and as `Existing` and `Sources` say.
-    /// The entries of an unchecked source are those that its header tells apart, and perhaps none.
-    AttachResult attach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse,
-                        Sources sources = Sources::Checked, FragmentIndex index = FragmentIndex::Leave) const;
-
-    /// Throws what `attach` would throw for these streams, and changes nothing. Useful before a movie is copied.
-    void checkAttach(const std::vector<StreamSource>& streams, Existing existing = Existing::Refuse,
-                     Sources sources = Sources::Checked) const;
+    /// Throws what `AttachPlan` and its `requireFor` throw.
+    ///@{
+    AttachResult attach(const AttachPlan& plan, FragmentIndex index = FragmentIndex::Leave) const;
+    AttachResult attach(const std::vector<StreamSource>& streams, ExistingStreams existing = ExistingStreams::Refuse,
+                        FragmentIndex index = FragmentIndex::Leave) const {
+        return attach(AttachPlan(streams, existing), index);
+    }
+    ///@}
 
     /// Appends what `ZULRAtomWriter::writeZULRtoFile` does, without ever ending the process. `creatorName` is not
     /// stored: on any system the platform's name, "Mac", stands in its place.

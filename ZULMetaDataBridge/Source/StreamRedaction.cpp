@@ -65,7 +65,7 @@ private:
 /// The pictures of cursors whose entries were removed, until a later entry takes them.
 class RemovedPictures {
 public:
-    explicit RemovedPictures(ReadBytes read) : read_(std::move(read)) {}
+    explicit RemovedPictures(ByteSource stream) : stream_(std::move(stream)) {}
 
     void remember(const CursorImage& cursor, const StreamEntry& entry) {
         if (cursor.imageDataSize > 0)
@@ -84,7 +84,7 @@ public:
         if (cursor.imageDataSize > 0)
             return cursor;
         std::string bytes(static_cast<std::size_t>(entry.size), '\0');
-        bytes.resize(read_(entry.offset, {bytes.data(), bytes.size()}));
+        bytes.resize(stream_.read(entry.offset, bytes));
         auto pictured = decodeEntry<CursorImage>(bytes, version);
         if (!pictured)
             return cursor;
@@ -93,7 +93,7 @@ public:
     }
 
 private:
-    ReadBytes read_;
+    ByteSource stream_;
     std::map<std::uint64_t, StreamEntry> entries_;
 };
 
@@ -107,9 +107,9 @@ public:
     /// The values of other kinds stay what they are. They may be no numbers, which equal nothing.
     static constexpr bool s_canChange = OneOf<Value, KeyStroke, std::string, CursorImage>;
 
-    EntryRedactor(const Redaction& redaction, const std::set<std::string>& heldTexts, ReadBytes read,
+    EntryRedactor(const Redaction& redaction, const std::set<std::string>& heldTexts, const ByteSource& stream,
                   RedactedStream& result, std::ostream& out)
-        : redaction_(redaction), times_(redaction.removedTimes), heldTexts_(heldTexts), pictures_(std::move(read)),
+        : redaction_(redaction), times_(redaction.removedTimes), heldTexts_(heldTexts), pictures_(stream),
           result_(result), out_(out) {}
 
     /// Returns false if the entry does not fit its kind.
@@ -271,13 +271,13 @@ void visitTexts(StreamEntries& entries, Visit visit) {
     });
 }
 
-std::set<std::string> textsHeldInside(const StreamSource::Bytes& stream, const Redaction& redaction) {
+std::set<std::string> textsHeldInside(const ByteSource& stream, const Redaction& redaction) {
     std::set<std::string> texts;
     if (redaction.removedTimes.empty())
         return texts;
     const detail::RemovedTimes times(redaction.removedTimes);
     HeldTexts held(times, texts);
-    StreamEntries entries = entriesOf(stream.read, stream.length);
+    StreamEntries entries(stream);
     visitTexts(entries, [&]<class Value>(const TimedValue<Value>& decoded) {
         if constexpr (std::same_as<Value, std::string>)
             held.add(decoded);
@@ -299,8 +299,8 @@ void reportRemovedStream(StreamEntries& entries, const Redaction& redaction) {
 
 } // namespace
 
-void collectRedactedTexts(const StreamSource::Bytes& stream, const Redaction& redaction, RedactedTexts& texts) {
-    StreamEntries entries = entriesOf(stream.read, stream.length);
+void collectRedactedTexts(const ByteSource& stream, const Redaction& redaction, RedactedTexts& texts) {
+    StreamEntries entries(stream);
     const RedactedStream::Removal removal = removalOf(entries.header(), redaction);
     const auto collect = [&](const std::string& text) {
         if (!isSecret(text))
@@ -321,9 +321,9 @@ void collectRedactedTexts(const StreamSource::Bytes& stream, const Redaction& re
         texts.hidden.merge(textsHeldInside(stream, redaction));
 }
 
-RedactedStream redactStream(const StreamSource::Bytes& stream, const Redaction& redaction, std::ostream& out) {
+RedactedStream redactStream(const ByteSource& stream, const Redaction& redaction, std::ostream& out) {
     RedactedStream result;
-    StreamEntries entries = entriesOf(stream.read, stream.length);
+    StreamEntries entries(stream);
     result.header = entries.header().value_or(MetaDataHeader());
     result.removal = removalOf(entries.header(), redaction);
     if (result.removal != RedactedStream::Kept) {
@@ -334,7 +334,7 @@ RedactedStream redactStream(const StreamSource::Bytes& stream, const Redaction& 
     const std::set<std::string> heldTexts = textsHeldInside(stream, redaction);
     std::uint64_t end = s_metaDataHeaderSize;
     const bool isWalked = isDecodable(result.header) && RecordedKinds::visit(result.header.uuid, [&]<class Kind>() {
-                              EntryRedactor<Kind> redactor(redaction, heldTexts, stream.read, result, out);
+                              EntryRedactor<Kind> redactor(redaction, heldTexts, stream, result, out);
                               end = walk(entries, [&](const StreamEntry& entry, std::string_view bytes) {
                                   return redactor.copy(entry, bytes);
                               });
@@ -346,7 +346,7 @@ RedactedStream redactStream(const StreamSource::Bytes& stream, const Redaction& 
             ++result.entries;
             return true;
         });
-    result.bytesLeftOut = stream.length - end;
+    result.bytesLeftOut = stream.size() - end;
     return result;
 }
 

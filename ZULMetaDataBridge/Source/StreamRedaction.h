@@ -9,8 +9,8 @@
 
 #include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
+#include "../../ZULMetaData/ByteSource.h"
 #include "../../ZULMetaData/ZULMMetaDataUUIDs.h"
-#include "StreamSource.h"
 
 #include <cstdint>
 #include <optional>
@@ -101,11 +101,9 @@ struct RedactedTexts {
 
 /// Adds the texts of one stream that go with the redaction. Empty texts are not secrets and are left out. A caller
 /// that redacts several streams collects the texts of all of them first, and hides each text in every stream.
-ZULMETADATA_API void collectRedactedTexts(const StreamSource::Bytes& stream, const Redaction& redaction,
-                                          RedactedTexts& texts);
+ZULMETADATA_API void collectRedactedTexts(const ByteSource& stream, const Redaction& redaction, RedactedTexts& texts);
 
 /// Appends the copy to `out`, or nothing if the stream is removed. Failures of `out` show in its state alone.
-ZULMETADATA_API RedactedStream redactStream(const StreamSource::Bytes& stream, const Redaction& redaction,
-                                            std::ostream& out);
+ZULMETADATA_API RedactedStream redactStream(const ByteSource& stream, const Redaction& redaction, std::ostream& out);
 
 } // namespace ZULMetaData

@@ -119,9 +119,9 @@ void copyEntries(StreamEntries& entries, RetimedStream& result, std::ostream& ou
 
 } // namespace
 
-RetimedStream retimeStream(const StreamSource::Bytes& stream, const Retiming& retiming, std::ostream& out) {
+RetimedStream retimeStream(const ByteSource& stream, const Retiming& retiming, std::ostream& out) {
     RetimedStream result;
-    StreamEntries entries = entriesOf(stream.read, stream.length);
+    StreamEntries entries(stream);
     if (!entries.header()) {
         result.isReadable = false;
         return result;
@@ -146,13 +146,13 @@ RetimedStream retimeStream(const StreamSource::Bytes& stream, const Retiming& re
         copyEntries(entries, result, out);
         end = entries.wholeBytes();
     }
-    result.bytesLeftOut = stream.length - end;
+    result.bytesLeftOut = stream.size() - end;
     return result;
 }
 
-TimeSpan timeSpanOf(const StreamSource::Bytes& stream, double end) {
+TimeSpan timeSpanOf(const ByteSource& stream, double end) {
     TimeSpan span;
-    StreamEntries entries = entriesOf(stream.read, stream.length);
+    StreamEntries entries(stream);
     if (!entries.header() || !isDecodable(*entries.header()))
         return span;
     while (const auto entry = entries.next()) {

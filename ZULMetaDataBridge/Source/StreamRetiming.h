@@ -8,8 +8,8 @@
 //     retimeStream(StreamSource::file("cursorLocation.dat").open(), retiming, copy);
 
 #include "../../SharedDependencies/Export.h"
+#include "../../ZULMetaData/ByteSource.h"
 #include "../../ZULMetaData/ZULMMetaDataUUIDs.h"
-#include "StreamSource.h"
 
 #include <cstdint>
 #include <optional>
@@ -38,8 +38,7 @@ struct RetimedStream {
 };
 
 /// Appends the copy to `out`. Failures of `out` show in its state alone. Throws `std::system_error` if reading fails.
-ZULMETADATA_API RetimedStream retimeStream(const StreamSource::Bytes& stream, const Retiming& retiming,
-                                           std::ostream& out);
+ZULMETADATA_API RetimedStream retimeStream(const ByteSource& stream, const Retiming& retiming, std::ostream& out);
 
 /// The least and the greatest finite time in a stream, both empty if it has none or nobody here knows where times are.
 struct TimeSpan {
@@ -49,6 +48,6 @@ struct TimeSpan {
 };
 
 /// Walks a whole stream. Throws `std::system_error` if reading fails.
-ZULMETADATA_API TimeSpan timeSpanOf(const StreamSource::Bytes& stream, double end);
+ZULMETADATA_API TimeSpan timeSpanOf(const ByteSource& stream, double end);
 
 } // namespace ZULMetaData

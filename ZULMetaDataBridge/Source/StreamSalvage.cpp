@@ -1,5 +1,6 @@
 #include "ZULMetaDataBridge/Source/StreamSalvage.h"
 
+#include "ZULMetaData/ByteReader.h"
 #include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
@@ -12,7 +13,6 @@
 #include <iterator>
 #include <string>
 #include <string_view>
-#include <tuple>
 #include <utility>
 
 namespace ZULMetaData {
@@ -75,13 +75,6 @@ bool canBeHeader(const MetaDataHeader& header) {
     return std::find(sizes.begin(), sizes.end(), header.fixedEntrySize) != sizes.end();
 }
 
-template <class Number>
-Number numberAt(std::string_view bytes, std::size_t offset) {
-    Number number{};
-    std::memcpy(&number, bytes.data() + offset, sizeof number);
-    return number;
-}
-
 /// The header of a DATA atom or chunk, which comes before a stream.
 struct DataHeader {
     std::uint64_t size = 0; ///< its own
@@ -96,7 +89,7 @@ std::size_t blockSizeFor(std::uint64_t size) {
 /// Returns the DATA header at the end of `before`, which may have any of its three forms.
 std::optional<DataHeader> dataHeaderAtEndOf(std::string_view before) {
     using namespace detail;
-    constexpr std::uint32_t type = swapInt(s_streamAtom); // as it is stored
+    constexpr std::uint32_t type = swapInt(s_streamAtom.value); // as it is stored
     const std::size_t end = before.size();
     if (end < s_chunkHeaderSize)
         return std::nullopt;
@@ -105,34 +98,35 @@ std::optional<DataHeader> dataHeaderAtEndOf(std::string_view before) {
     const auto without = [](std::uint64_t headerSize, std::uint64_t size) {
         return DataHeader{headerSize, size < headerSize ? 0 : size - headerSize};
     };
-    if (end >= s_extendedAtomHeaderSize && numberAt<std::uint32_t>(before, extended + 4) == type &&
-        swapInt(numberAt<std::uint32_t>(before, extended)) == s_extendedSizeMarker)
-        return without(s_extendedAtomHeaderSize, swapInt(numberAt<std::uint64_t>(before, chunk)));
-    if (numberAt<std::uint32_t>(before, chunk + 4) == type)
-        return without(s_atomHeaderSize, swapInt(numberAt<std::uint32_t>(before, chunk)));
-    if (numberAt<std::uint32_t>(before, chunk) == type)
-        return DataHeader{s_chunkHeaderSize, numberAt<std::uint32_t>(before, chunk + 4)};
+    if (end >= s_extendedAtomHeaderSize && detail::numberIn<std::uint32_t>(before, extended + 4) == type &&
+        swapInt(detail::numberIn<std::uint32_t>(before, extended)) == s_extendedSizeMarker)
+        return without(s_extendedAtomHeaderSize, swapInt(detail::numberIn<std::uint64_t>(before, chunk)));
+    if (detail::numberIn<std::uint32_t>(before, chunk + 4) == type)
+        return without(s_atomHeaderSize, swapInt(detail::numberIn<std::uint32_t>(before, chunk)));
+    if (detail::numberIn<std::uint32_t>(before, chunk) == type)
+        return DataHeader{s_chunkHeaderSize, detail::numberIn<std::uint32_t>(before, chunk + 4)};
     return std::nullopt;
 }
 
+/// Sorts by kind, and puts the stream with more entries, the better origin and the later place first.
+bool isBetter(const SalvagedStream& left, const SalvagedStream& right) {
+    if (left.header.uuid != right.header.uuid)
+        return left.header.uuid < right.header.uuid;
+    if (left.entries != right.entries)
+        return left.entries > right.entries;
+    return left.origin != right.origin ? left.origin < right.origin : left.offset > right.offset;
+}
+
 /// Marker and type of an atom as the library writes it. No other bytes of a stream are likely to look like this.
-std::string itemMark(std::uint32_t type) {
+std::string itemMark(FourCC type) {
     const auto header = detail::extendedAtomHeader(type, 0);
     return {header.data(), detail::s_atomHeaderSize};
 }
 
-ReadBytes readingBehind(ReadBytes read, std::uint64_t offset) {
-    return [read = std::move(read), offset](std::uint64_t position, std::span<char> bytes) {
-        return read(offset + position, bytes);
-    };
-}
-
 } // namespace
 
-StreamSalvage::StreamSalvage(std::istream& file, Container::Type type, Progress progress)
-    : read_(readingFrom(file)), file_(file), type_(type), progress_(std::move(progress)) {
-    total_ = sizeOfInput(file_);
-}
+StreamSalvage::StreamSalvage(ByteSource file, Container::Type type, Progress progress)
+    : file_(std::move(file)), type_(type), progress_(std::move(progress)), total_(file_.size()) {}
 
 SalvageReport StreamSalvage::run() {
     candidates_.clear();
@@ -149,7 +143,7 @@ void StreamSalvage::findReachable() {
         Candidate found{{}, begin};
         MetaDataHeader& header = found.stream.header;
         if (declared < sizeof header || reachable_.size() == SalvageReport::s_maximumStreams ||
-            read_(offset, {reinterpret_cast<char*>(&header), sizeof header}) < sizeof header)
+            file_.read(offset, {reinterpret_cast<char*>(&header), sizeof header}) < sizeof header)
             return;
         found.stream.origin = SalvagedStream::Reachable;
         found.stream.offset = offset;
@@ -158,16 +152,15 @@ void StreamSalvage::findReachable() {
     };
     if (type_ == Container::RawStream)
         return add(0, 0, total_);
-    const auto listChildren = type_ == Container::QuickTime ? listAtoms : listChunks;
-    const auto readable = [this](std::vector<ContainerItem> items) {
-        requireReadable(file_);
-        return items;
-    };
-    for (const ContainerItem& item : readable(listTopLevel(file_, type_)))
-        if (item.holdsMetaData() && item.size != 0)
-            for (const ContainerItem& child : readable(listChildren(file_, item.payloadOffset(), item.end(), total_)))
-                if (child.holdsStream())
-                    add(child.offset, child.payloadOffset(), child.payloadSize());
+    ItemWalk items(file_, type_);
+    while (const auto item = items.next()) {
+        if (!item->holdsMetaData() || item->size == 0)
+            continue;
+        ItemWalk children = items.inside(*item);
+        while (const auto child = children.next())
+            if (child->holdsStream())
+                add(child->offset, child->payloadOffset(), child->payloadSize());
+    }
 }
 
 void StreamSalvage::search() {
@@ -175,7 +168,7 @@ void StreamSalvage::search() {
     std::string block(s_before + s_behind + blockSize, '\0');
     std::size_t kept = 0; // of the block before, in front of what is read
     for (std::uint64_t position = 0; position < total_;) {
-        const std::size_t size = read_(position, {block.data() + kept, blockSize});
+        const std::size_t size = file_.read(position, {block.data() + kept, blockSize});
         if (size == 0)
             return;
         searchIn({block.data(), kept + size}, kept, position - kept);
@@ -202,7 +195,7 @@ void StreamSalvage::searchIn(std::string_view bytes, std::size_t kept, std::uint
 }
 
 void StreamSalvage::consider(std::string_view bytes, std::string_view before, std::uint64_t offset) {
-    const auto header = numberAt<MetaDataHeader>(bytes, 0);
+    const auto header = detail::numberIn<MetaDataHeader>(bytes, 0);
     if (!canBeHeader(header))
         return;
     hasMore_ |= candidates_.size() == SalvageReport::s_maximumStreams;
@@ -242,7 +235,7 @@ void StreamSalvage::measureAll() {
 bool StreamSalvage::beginsLikeStream(const SalvagedStream& stream) const {
     if (stream.declaredBytes == s_metaDataHeaderSize)
         return true;
-    StreamEntries entries = entriesOf(readingBehind(read_, stream.offset), declaredEndOf(stream) - stream.offset);
+    StreamEntries entries(file_.part(stream.offset, declaredEndOf(stream) - stream.offset));
     const auto first = entries.next();
     return first && canBeEntry(stream.header, entries.bytesOf(*first));
 }
@@ -281,7 +274,7 @@ std::uint64_t StreamSalvage::limitOf(std::size_t index) const {
 }
 
 void StreamSalvage::walk(SalvagedStream& stream, std::uint64_t limit) const {
-    StreamEntries entries = entriesOf(readingBehind(read_, stream.offset), limit - stream.offset);
+    StreamEntries entries(file_.part(stream.offset, limit - stream.offset));
     stream.bytes = std::min<std::uint64_t>(s_metaDataHeaderSize, limit - stream.offset);
     stream.entries = 0;
     if (stream.origin == SalvagedStream::Reachable && stream.header.fixedEntrySize != entrySizeOf(stream.header)) {
@@ -303,7 +296,7 @@ std::uint64_t StreamSalvage::nextItemIn(std::uint64_t begin, std::uint64_t end) 
     std::string block(blockSizeFor(end - std::min(begin, end)), '\0');
     for (std::uint64_t position = begin; position < end;) {
         const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(block.size(), end - position));
-        const std::size_t size = read_(position, {block.data(), wanted});
+        const std::size_t size = file_.read(position, {block.data(), wanted});
         const std::string_view bytes(block.data(), size);
         std::size_t first = std::string_view::npos;
         for (const std::string& mark : marks)
@@ -323,12 +316,7 @@ SalvageReport StreamSalvage::report() {
     for (const Candidate& candidate : candidates_)
         if (candidate.isStream)
             report.streams.push_back(candidate.stream);
-    const auto rank = [](const SalvagedStream& stream) {
-        constexpr std::uint64_t most = ~std::uint64_t{0};
-        return std::tuple(stream.header.uuid, most - stream.entries, stream.origin, most - stream.offset);
-    };
-    std::sort(report.streams.begin(), report.streams.end(),
-              [&](const SalvagedStream& left, const SalvagedStream& right) { return rank(left) < rank(right); });
+    std::sort(report.streams.begin(), report.streams.end(), isBetter);
     return report;
 }
 

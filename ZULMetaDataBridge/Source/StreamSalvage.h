@@ -15,7 +15,6 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <istream>
 #include <optional>
 #include <string_view>
 #include <vector>
@@ -65,10 +64,10 @@ public:
     /// Called from time to time with the number of bytes that have been searched.
     using Progress = Callback<void(std::uint64_t done)>;
 
-    /// `file` must outlive this object. If `type` is `Unknown` or `RawStream`, there is no container to walk along; a
+    /// If `type` is `Unknown` or `RawStream`, there is no container to walk along; a
     /// stream at the beginning of a bare stream file is reachable. Throws `std::system_error` if the size of the file
     /// cannot be determined.
-    StreamSalvage(std::istream& file, Container::Type type, Progress progress = {});
+    StreamSalvage(ByteSource file, Container::Type type, Progress progress = {});
 
     /// Searches the whole file with a few megabytes of memory. Throws `std::system_error` if the file cannot be read.
     SalvageReport run();
@@ -93,8 +92,7 @@ private:
     std::uint64_t nextItemIn(std::uint64_t begin, std::uint64_t end) const;
     SalvageReport report();
 
-    ReadBytes read_;
-    std::istream& file_;
+    ByteSource file_;
     Container::Type type_;
     Progress progress_;
     std::uint64_t total_ = 0;

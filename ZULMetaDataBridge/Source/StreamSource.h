@@ -6,15 +6,18 @@
 #include "../../Platform/FileLocation.h"
 #include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
-#include "../../ZULMetaData/StreamExtent.h"
+#include "../../ZULMetaData/ByteSource.h"
 
 #include <cstdint>
+#include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 
 namespace ZULMetaData {
 
-/// The source of a stream. It opens its file only when it is used. Copies refer to the same stream.
+/// The source of a stream. It opens its file when it is used for the first time, and only once. Copies refer to the
+/// same stream and the same open file.
 class ZULMETADATA_API StreamSource {
 public:
     /// Returns a source for a whole stream file.
@@ -24,26 +27,30 @@ public:
     /// is the place that `fileDataForUUID` returns.
     static StreamSource part(const FileLocation& file, std::uint64_t offset, std::uint64_t length);
 
-    /// Bytes of the caller, such as `loadAllData` gives, which must outlive the source. `name` is for messages.
+    /// Returns a source for bytes that are open already. `name` is for messages.
+    static StreamSource bytes(ByteSource bytes, std::string name);
+
+    /// Returns a source for bytes of the caller, such as `loadAllData` provides, which must outlive it.
     static StreamSource memory(std::string_view bytes, std::string name);
 
-    /// The same bytes under another name.
-    StreamSource named(std::string name) const { return {std::move(name), open_}; }
+    /// Returns the same source without the check that its bytes look like a stream: a stream of a registered kind and
+    /// version that holds at least one whole entry, or nothing after its header. Anything else is often a wrong path,
+    /// whose first 24 bytes would pass for a header. Its entries are those that the header tells apart, perhaps none.
+    StreamSource unchecked() const;
 
-    const std::string& name() const { return name_; } ///< the path of its file, or what `memory` was given
+    const std::string& name() const { return name_; } ///< returns the path of its file, or what the caller said
+    bool isChecked() const { return isChecked_; }     ///< returns false after `unchecked`
 
-    /// The stream's bytes, ready to be read. Throws `std::system_error` where its file cannot be opened.
-    struct Bytes {
-        std::uint64_t length = 0; ///< of the stream, header included
-        ReadBytes read;           ///< counts from the header on; keeps its file open
-    };
-    Bytes open() const { return open_(); } ///< independent of those that were opened before
+    /// Returns the bytes of the stream, header included. Throws `std::system_error` if its file cannot be opened.
+    ByteSource open() const;
 
 private:
-    StreamSource(std::string name, Callback<Bytes()> open) : name_(std::move(name)), open_(std::move(open)) {}
+    StreamSource(std::string name, Callback<ByteSource()> open);
 
     std::string name_;
-    Callback<Bytes()> open_;
+    Callback<ByteSource()> open_;
+    std::shared_ptr<std::optional<ByteSource>> opened_;
+    bool isChecked_ = true;
 };
 
 } // namespace ZULMetaData

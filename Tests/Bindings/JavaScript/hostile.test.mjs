@@ -27,6 +27,7 @@ async function readAll(bytes, name) {
     verify: await tried(() => recording.verify()),
   };
   for (const { kind } of recording.streams) await tried(() => recording.entries(kind));
+  await tried(() => recording.keyCaptions());
   for (const index of recording.hidden.keys()) await tried(() => recording.hiddenEntries(index));
   return read;
 }

@@ -71,6 +71,24 @@ test('gives columns of the types that are promised', async () => {
   assert.equal(images.at(-1), null);
 });
 
+test('joins keys into the captions that the tool writes', async () => {
+  const recording = await open(movie);
+  for (const showsKeys of [true, false]) {
+    const { time, columns } = recording.keyCaptions(showsKeys);
+    assert.ok(time.length > 0 && time.every((at, index) => index === 0 || at >= time[index - 1]));
+    const texts = new Map();
+    columns.label.forEach((label, index) => {
+      const first = columns.first[index];
+      const joint = index === first || (columns.isTyped[index - 1] && columns.isTyped[index]) ? '' : ' ';
+      texts.set(first, (texts.get(first) ?? '') + joint + label);
+      assert.ok(columns.end[index] > time[index]);
+    });
+    const { stdout } = zulm('convert', '--to', 'vtt', ...(showsKeys ? ['--show-keys'] : []), movie);
+    const printed = stdout.split('\n\n').slice(1).map((cue) => cue.trim().split('\n')[1]);
+    assert.deepEqual([...texts.values()], printed.filter(Boolean));
+  }
+});
+
 test('sums every stream up', async () => {
   const recording = await open(movie);
   assert.equal(recording.container, 'movie');
@@ -138,6 +156,11 @@ test('says in words what it cannot do', async () => {
   assert.throws(() => recording.dump(['nothing']), said('Mine.mp4: holds no stream nothing'));
   recording.close();
   assert.throws(() => recording.info(), said('Mine.mp4: is closed'));
+});
+
+test('says that there are no keys', async () => {
+  const recording = await open(streams.find((path) => path.endsWith('/slideText.dat')));
+  assert.throws(() => recording.keyCaptions(), { name: 'ZulmError', message: /holds no stream keyboardAction$/ });
 });
 
 test('keeps what it gave out when it is closed', async () => {

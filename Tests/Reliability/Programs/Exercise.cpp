@@ -99,7 +99,7 @@ void Exercise::validate() {
 void Exercise::salvage() {
     guard("salvage", [&] {
         std::ifstream file(path_, std::ios::binary);
-        for (const SalvagedStream& stream : StreamSalvage(file, type_).run().streams)
+        for (const SalvagedStream& stream : StreamSalvage(ByteSource::stream(file), type_).run().streams)
             if (stream.end() > bytes_.size())
                 throw Broken("salvage gives bytes that are not there");
     });

@@ -426,7 +426,8 @@ std::string findingsIn(const std::string& file) {
 std::string salvagedFrom(const std::string& bytes) {
     std::istringstream file(bytes);
     std::string text;
-    for (const SalvagedStream& stream : StreamSalvage(file, MetaDataParser::QuickTime).run().streams)
+    for (const SalvagedStream& stream :
+         StreamSalvage(ByteSource::stream(file), MetaDataParser::QuickTime).run().streams)
         text += std::to_string(stream.offset) + ' ' + std::to_string(stream.bytes) + '\n';
     return text;
 }

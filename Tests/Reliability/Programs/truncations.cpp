@@ -112,7 +112,7 @@ private:
     void learnStreams() {
         std::ifstream file(path_, std::ios::binary);
         // Also those that only a repair makes reachable.
-        for (const SalvagedStream& stream : StreamSalvage(file, type_).run().streams) {
+        for (const SalvagedStream& stream : StreamSalvage(ByteSource::stream(file), type_).run().streams) {
             Recorded recorded{stream.header.uuid, {}, {}};
             StreamEntries entries = entriesOf(
                 [&, read = readingFrom(file)](std::uint64_t position, std::span<char> bytes) {
@@ -133,7 +133,7 @@ private:
     void learnEnds() {
         ends_.insert(0);
         std::istringstream file(original_);
-        const auto items = listTopLevel(file, type_);
+        const auto items = topLevelItems(ByteSource::stream(file), type_);
         for (const ContainerItem& item : items) {
             if (type_ == MetaDataParser::QuickTime && (item.sizeField == 0 || item.size == 0))
                 break; // an open end
@@ -192,7 +192,7 @@ private:
 
     void checkSalvage() {
         std::istringstream file(cut_);
-        const auto streams = StreamSalvage(file, type_).run().streams;
+        const auto streams = StreamSalvage(ByteSource::stream(file), type_).run().streams;
         for (const Recorded& recorded : recorded_) {
             std::uint64_t salvaged = 0;
             for (const SalvagedStream& stream : streams)

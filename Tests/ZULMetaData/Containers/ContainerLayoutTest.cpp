@@ -6,15 +6,11 @@
 
 #include <gtest/gtest.h>
 
-#include <sstream>
-
 namespace ZULMetaData::Test {
 namespace {
 
-std::vector<ContainerItem> itemsOf(const std::string& bytes,
-                                   MetaDataParser::StreamType type = MetaDataParser::QuickTime) {
-    std::stringstream stream(bytes);
-    return listTopLevel(stream, type);
+std::vector<ContainerItem> itemsOf(const std::string& bytes, Container::Type type = Container::QuickTime) {
+    return topLevelItems(ByteSource::memory(bytes), type);
 }
 
 TEST(ContainerLayout, GivesPlaceAndSizeOfEveryAtom) {
@@ -27,24 +23,6 @@ TEST(ContainerLayout, GivesPlaceAndSizeOfEveryAtom) {
     EXPECT_EQ(atoms[1].payloadOffset(), 28U);
     EXPECT_EQ(atoms[1].payloadSize(), 5U);
     EXPECT_EQ(atoms[2].offset, 33U);
-}
-
-TEST(ContainerLayout, LeavesAStreamFailedWhoseSizeCannotBeTold) {
-    struct UnseekableBuffer final : std::stringbuf {
-        using std::stringbuf::stringbuf;
-        pos_type seekoff(off_type, std::ios_base::seekdir, std::ios_base::openmode) override { return off_type(-1); }
-    } buffer(atom("ftyp", "isom"));
-    std::istream stream(&buffer);
-    EXPECT_TRUE(listTopLevel(stream, MetaDataParser::QuickTime).empty());
-    EXPECT_TRUE(stream.fail());
-}
-
-TEST(ContainerLayout, WalksAStreamWhateverItsState) {
-    std::stringstream stream(atom("moov", atom("mvhd")) + atom("free"));
-    stream.setstate(std::ios_base::eofbit | std::ios_base::failbit);
-    EXPECT_EQ(listTopLevel(stream, MetaDataParser::QuickTime).size(), 2U);
-    stream.setstate(std::ios_base::eofbit | std::ios_base::failbit);
-    EXPECT_EQ(listAtoms(stream, 8, 16, 24).size(), 1U);
 }
 
 TEST(ContainerLayout, TellsTheFormsOfHeadersApart) {
@@ -73,7 +51,7 @@ TEST(ContainerLayout, KnowsWhatHoldsMetaDataAndStreams) {
     EXPECT_TRUE(atoms[0].holdsMetaData() && !atoms[0].holdsStream());
     EXPECT_TRUE(atoms[1].holdsStream() && !atoms[1].holdsMetaData());
     EXPECT_FALSE(atoms[2].holdsStream() || atoms[2].holdsMetaData());
-    const auto chunks = itemsOf(chunk("ZULM", chunk("DATA")), MetaDataParser::Riff);
+    const auto chunks = itemsOf(chunk("ZULM", chunk("DATA")), Container::Riff);
     EXPECT_TRUE(chunks[0].holdsMetaData());
 }
 
@@ -85,30 +63,55 @@ TEST(ContainerLayout, KnowsWhatHoldsRecordingInfo) {
 }
 
 TEST(ContainerLayout, GivesChunksWithoutTheirPadByte) {
-    const auto chunks = itemsOf(chunk("RIFF", "odd") + chunk("junk", "even"), MetaDataParser::Riff);
+    const auto chunks = itemsOf(chunk("RIFF", "odd") + chunk("junk", "even"), Container::Riff);
     ASSERT_EQ(chunks.size(), 2U);
     EXPECT_EQ(chunks[0].size, 11U);
     EXPECT_EQ(chunks[0].sizeField, 3U);
     EXPECT_EQ(chunks[1].offset, 12U);
 }
 
-TEST(ContainerLayout, EndsBehindAnItemThatNothingCanFollow) {
+TEST(ContainerLayout, EndsAfterAnItemThatNothingCanFollow) {
     EXPECT_EQ(itemsOf(be32(100) + "mdat" + atom("free")).size(), 1U);         // reaches beyond the end
     EXPECT_EQ(itemsOf(be32(1) + "mdat" + be64(0) + atom("free")).size(), 1U); // has no size yet
     EXPECT_EQ(itemsOf(atom("ftyp") + "1234567").size(), 1U);                  // too few bytes for a header
-    EXPECT_EQ(itemsOf(chunk("RIFF") + "1234567", MetaDataParser::Riff).size(), 1U);
+    EXPECT_EQ(itemsOf(chunk("RIFF") + "1234567", Container::Riff).size(), 1U);
     EXPECT_TRUE(itemsOf("").empty());
 }
 
-TEST(ContainerLayout, ListsTheInsideOfAnAtom) {
-    std::stringstream stream(atom("moov", atom("mvhd") + atom("trak", "x")) + atom("free"));
-    const auto children = listAtoms(stream, 8, 25, 33);
-    ASSERT_EQ(children.size(), 2U);
-    EXPECT_EQ(children[1].type, "trak");
+TEST(ContainerLayout, WalksOverTheInsideOfAnAtom) {
+    const std::string bytes = atom("moov", atom("mvhd") + atom("trak", "x")) + atom("free");
+    ItemWalk atoms(ByteSource::memory(bytes), Container::QuickTime);
+    ItemWalk children = atoms.inside(*atoms.next());
+    EXPECT_EQ(children.next()->type, "mvhd");
+    EXPECT_EQ(atoms.next()->type, "free") << "walks do not disturb each other";
+    EXPECT_EQ(children.next()->type, "trak");
+    EXPECT_FALSE(children.next());
+}
+
+TEST(ContainerLayout, TellsHowManyBytesAreTooFewForAHeader) {
+    const std::string bytes = atom("ftyp", "isom") + "1234567";
+    ItemWalk atoms(ByteSource::memory(bytes), Container::QuickTime);
+    EXPECT_TRUE(atoms.next());
+    EXPECT_FALSE(atoms.next());
+    EXPECT_EQ(atoms.end() - atoms.position(), 7U);
+}
+
+TEST(ContainerLayout, TakesTheSizesBelowAHeaderLiterallyIfAskedTo) {
+    const std::string bytes = be32(5) + "oddl" + be64(16);
+    ItemWalk atoms(ByteSource::memory(bytes), Container::QuickTime);
+    atoms.takeSizesLiterally();
+    EXPECT_EQ(atoms.next()->size, 5U);
+}
+
+TEST(FourCC, IsFourCharactersInTheOrderOfTheFile) {
+    EXPECT_EQ(FourCC("moov").value, 0x6d6f6f76U);
+    EXPECT_EQ(FourCC(0x6d6f6f76).text(), "moov");
+    EXPECT_TRUE(FourCC("a ~b").isPrintable());
+    EXPECT_FALSE(FourCC("\xa9too").isPrintable());
 }
 
 TEST(ContainerLayout, HasNothingToListInABareStream) {
-    EXPECT_TRUE(itemsOf(streamHeader("2b7b6af2", 1, 16), MetaDataParser::RawStream).empty());
+    EXPECT_TRUE(itemsOf(streamHeader("2b7b6af2", 1, 16), Container::RawStream).empty());
 }
 
 } // namespace

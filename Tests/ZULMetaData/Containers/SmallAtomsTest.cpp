@@ -6,6 +6,7 @@
 #include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/RepairPlan.h"
 #include "ZULMetaData/PositionedInput.h"
+#include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <gtest/gtest.h>
 
@@ -63,11 +64,11 @@ TEST_F(SmallAtoms, AreScannedInOnePass) {
 }
 
 TEST_F(SmallAtoms, AreListedInOnePass) {
-    EXPECT_EQ(listTopLevel(movieOf(overlapping), MetaDataParser::QuickTime).size(), s_size / 8);
+    EXPECT_EQ(topLevelItems(ByteSource::stream(movieOf(overlapping)), Container::QuickTime).size(), s_size / 8);
 }
 
 TEST_F(SmallAtoms, AreConsideredForARepairInOnePass) {
-    EXPECT_EQ(planRepair(movieOf(empty)).state, RepairPlan::Whole);
+    EXPECT_EQ(planRepair(ByteSource::stream(movieOf(empty))).state, RepairPlan::Whole);
 }
 
 TEST_F(SmallAtoms, MayEndInsideTheirOwnHeaders) {

@@ -34,9 +34,9 @@ std::string piped(std::uint32_t size, const std::string& samples) {
     return "RIFF" + le32(size) + "WAVE" + chunk("fmt ", std::string(16, '\1')) + "data" + le32(size) + samples;
 }
 
-std::optional<detail::WideRIFF> widthOf(const std::string& file) {
-    std::istringstream stream(file);
-    return detail::wideRIFF(stream);
+std::optional<ContainerItem> widthOf(const std::string& file) {
+    detail::ByteReader reader(ByteSource::memory(file));
+    return detail::wideRIFF(reader);
 }
 
 std::vector<FoundStream> foundIn(const std::string& file) {
@@ -55,8 +55,8 @@ TEST(WideRIFF, TakesTheSizeInTheSizeChunk) {
         const std::string file = rf64(chunk("data", "12345678"), signature);
         const auto wide = widthOf(file + zulmChunk({locationStream()}));
         ASSERT_TRUE(wide) << signature;
-        EXPECT_TRUE(wide->isDeclared);
-        EXPECT_EQ(wide->end, file.size());
+        EXPECT_EQ(wide->sizeSource, ContainerItem::SizeChunk);
+        EXPECT_EQ(wide->end(), file.size());
         EXPECT_EQ(foundIn(file + zulmChunk({locationStream()})),
                   (std::vector<FoundStream>{{kind(s_cursorLocations), file.size() + 16, 56}}));
     }
@@ -65,8 +65,8 @@ TEST(WideRIFF, TakesTheSizeInTheSizeChunk) {
 TEST(WideRIFF, FindsNothingBehindASizeBeyondTheFile) {
     for (const std::uint64_t size : {std::uint64_t(5000), minus(1) - 1, minus(8), minus(16), minus(20)}) {
         const std::string file = rf64("RF64", size, chunk("data", "12345678")) + zulmChunk({locationStream()});
-        EXPECT_TRUE(widthOf(file)->isDeclared);
-        EXPECT_GT(widthOf(file)->end, file.size());
+        EXPECT_EQ(widthOf(file)->sizeSource, ContainerItem::SizeChunk);
+        EXPECT_GT(widthOf(file)->end(), file.size());
         EXPECT_TRUE(foundIn(file).empty());
     }
 }
@@ -76,12 +76,12 @@ TEST(WideRIFF, SearchesFilesFromAPipe) {
         for (const std::string& samples :
              {std::string("samples."), std::string("a ZULM of nothing..."), std::string()}) {
             const std::string file = piped(size, samples);
-            EXPECT_EQ(widthOf(file)->end, file.size()) << size;
+            EXPECT_EQ(widthOf(file)->end(), file.size()) << size;
             EXPECT_TRUE(foundIn(file).empty());
             const auto wide = widthOf(file + zulmChunk({locationStream(), appNameStream()}));
             ASSERT_TRUE(wide);
-            EXPECT_FALSE(wide->isDeclared);
-            EXPECT_EQ(wide->end, file.size());
+            EXPECT_EQ(wide->sizeSource, ContainerItem::FileEnd);
+            EXPECT_EQ(wide->end(), file.size());
             EXPECT_EQ(foundIn(file + zulmChunk({locationStream(), appNameStream()})).size(), 2U);
             EXPECT_EQ(foundIn(file + zulmChunk({locationStream()}) + zulmChunk({appNameStream()})).size(), 2U);
         }
@@ -89,13 +89,13 @@ TEST(WideRIFF, SearchesFilesFromAPipe) {
 
 TEST(WideRIFF, SearchesA64BitFileThatCameFromAPipe) {
     const std::string file = rf64("RF64", 0, chunk("data", "12345678"));
-    EXPECT_EQ(widthOf(file + zulmChunk({locationStream()}))->end, file.size());
+    EXPECT_EQ(widthOf(file + zulmChunk({locationStream()}))->end(), file.size());
 }
 
 TEST(WideRIFF, FindsMetadataThatWasCutShort) {
     const std::string file = piped(0xffffffff, "samples.");
     const std::string whole = file + zulmChunk({locationStream()});
-    EXPECT_EQ(widthOf(whole.substr(0, whole.size() - 9))->end, file.size());
+    EXPECT_EQ(widthOf(whole.substr(0, whole.size() - 9))->end(), file.size());
     EXPECT_EQ(foundIn(whole.substr(0, whole.size() - 9)).size(), 1U);
 }
 
@@ -111,16 +111,16 @@ TEST(WideRIFF, SearchesNoMoreThanTheTailOfALargeFile) {
 
 TEST(WideRIFF, IsListedWithItsTrueSize) {
     const std::string file = rf64(chunk("data", "12345678"));
-    std::istringstream stream(file + zulmChunk({locationStream()}));
-    const auto items = listTopLevel(stream, MetaDataParser::Riff);
+    const std::string whole = file + zulmChunk({locationStream()});
+    const auto items = topLevelItems(ByteSource::memory(whole), Container::Riff);
     ASSERT_EQ(items.size(), 2U);
     EXPECT_EQ(items[0].type, "RF64");
     EXPECT_EQ(items[0].size, file.size());
     EXPECT_EQ(items[0].sizeSource, ContainerItem::SizeChunk);
     EXPECT_EQ(items[1].type, "ZULM");
     EXPECT_EQ(items[1].sizeSource, ContainerItem::Header);
-    std::istringstream pipe(piped(0, "samples.") + zulmChunk({locationStream()}));
-    EXPECT_EQ(listTopLevel(pipe, MetaDataParser::Riff)[0].sizeSource, ContainerItem::FileEnd);
+    const std::string pipe = piped(0, "samples.") + zulmChunk({locationStream()});
+    EXPECT_EQ(topLevelItems(ByteSource::memory(pipe), Container::Riff)[0].sizeSource, ContainerItem::FileEnd);
 }
 
 TEST(WideRIFF, AlwaysComesToAnEnd) {

@@ -27,11 +27,10 @@ bool isTextByte(char byte) {
 
 /// `typeOffset` is where the four characters of the type stand in the header.
 MediaPlace blanked(MediaPlace::Use use, const std::string& path, const ContainerItem& item, std::uint64_t typeOffset,
-                   std::uint32_t type) {
-    const auto characters = bigEndianBytes(type);
+                   FourCC type) {
+    const std::string characters = type.text();
     MediaPlace place{use, path, item.offset, item.size, {}};
-    place.blanks.push_back(
-        {item.offset + typeOffset, characters.size(), std::string(characters.begin(), characters.end())});
+    place.blanks.push_back({item.offset + typeOffset, characters.size(), characters});
     if (item.payloadSize() > 0)
         place.blanks.push_back({item.payloadOffset(), item.payloadSize(), {}});
     return place;
@@ -43,9 +42,9 @@ bool isZero(std::string_view bytes) {
     return bytes.front() == 0 && std::memcmp(bytes.data(), bytes.data() + 1, bytes.size() - 1) == 0;
 }
 
-std::string readBytes(const ReadBytes& read, std::uint64_t offset, std::uint64_t size, std::uint64_t limit) {
+std::string readBytes(const ByteSource& file, std::uint64_t offset, std::uint64_t size, std::uint64_t limit) {
     std::string bytes(static_cast<std::size_t>(std::min(size, limit)), '\0');
-    bytes.resize(read(offset, {bytes.data(), bytes.size()}));
+    bytes.resize(file.read(offset, bytes));
     return bytes;
 }
 
@@ -87,9 +86,9 @@ std::vector<std::string> textRuns(std::string_view bytes) {
 }
 
 std::string shownType(const ContainerItem& item) {
-    if (std::all_of(item.type.begin(), item.type.end(), isPrintable))
-        return textFromLatin1(item.type);
-    return '#' + std::to_string(bigEndianAt(item.type, 0, item.type.size()));
+    const std::string type = item.type.text();
+    return std::all_of(type.begin(), type.end(), isPrintable) ? textFromLatin1(type)
+                                                              : '#' + std::to_string(item.type.value);
 }
 
 MediaPlace blankedAtom(MediaPlace::Use use, const std::string& path, const ContainerItem& atom) {
@@ -100,9 +99,9 @@ MediaPlace blankedChunk(MediaPlace::Use use, const std::string& path, const Cont
     return blanked(use, path, chunk, 0, s_junkChunk);
 }
 
-bool isBlank(const ReadBytes& read, const ContainerItem& item) {
+bool isBlank(const ByteSource& file, const ContainerItem& item) {
     for (std::uint64_t done = 0; done < item.payloadSize(); done += s_blankPiece) {
-        const std::string bytes = readBytes(read, item.payloadOffset() + done, item.payloadSize() - done, s_blankPiece);
+        const std::string bytes = readBytes(file, item.payloadOffset() + done, item.payloadSize() - done, s_blankPiece);
         if (bytes.empty())
             break;
         if (!isZero(bytes))

@@ -2,8 +2,8 @@
 
 // Numbers and texts in the parts of a container that are read whole.
 
+#include "ZULMetaData/ByteSource.h"
 #include "ZULMetaData/Containers/ContainerLayout.h"
-#include "ZULMetaData/StreamExtent.h"
 #include "ZULMetaDataBridge/Source/Redaction/MediaPlaces.h"
 
 #include <algorithm>
@@ -20,15 +20,15 @@ constexpr int s_deepestLevel = 16;               ///< of atoms or lists inside e
 constexpr std::uint64_t s_longestRead = 1 << 20; ///< bytes of an atom or chunk that is read as text
 
 template <std::size_t size>
-bool isOneOf(std::string_view type, const std::array<std::string_view, size>& types) {
+bool isOneOf(FourCC type, const std::array<FourCC, size>& types) {
     return std::find(types.begin(), types.end(), type) != types.end();
 }
 
 /// Returns whether all bytes are zero; there must be at least one.
 bool isZero(std::string_view bytes);
 
-/// Returns fewer bytes at the end of the input, and at most `limit`.
-std::string readBytes(const ReadBytes& read, std::uint64_t offset, std::uint64_t size, std::uint64_t limit);
+/// Returns fewer bytes at the end of the file, and at most `limit`.
+std::string readBytes(const ByteSource& file, std::uint64_t offset, std::uint64_t size, std::uint64_t limit);
 
 /// Returns 0 if the bytes do not reach that far.
 ///@{
@@ -55,6 +55,6 @@ MediaPlace blankedChunk(MediaPlace::Use use, const std::string& path, const Cont
 ///@}
 
 /// Returns whether every byte after an item's header is zero already.
-bool isBlank(const ReadBytes& read, const ContainerItem& item);
+bool isBlank(const ByteSource& file, const ContainerItem& item);
 
 } // namespace ZULMetaData::detail

@@ -38,28 +38,19 @@ bool isPlaceholder(const RedactedEntry& entry) {
 
 } // namespace
 
-std::vector<StreamPart> streamsIn(MetaDataParser& recording) {
-    const ReadBytes read = readingFrom(recording.getStream());
-    const std::uint64_t total = sizeOfInput(recording.getStream());
+std::vector<StreamPart> streamsIn(MetaDataParser& recording, const ByteSource& file) {
     std::vector<StreamPart> streams;
     for (const uuid& type : recording.getAvailableMetaDataUUIDs()) {
         const auto [offset, length] = recording.fileDataForUUID(type);
-        const std::uint64_t begin = std::min(offset, total);
-        const std::uint64_t present = std::min(length, total - begin);
-        const auto readStream = [read, begin, present](std::uint64_t position, std::span<char> bytes) {
-            const std::uint64_t left = present - std::min(position, present);
-            return read(begin + position,
-                        bytes.first(static_cast<std::size_t>(std::min<std::uint64_t>(bytes.size(), left))));
-        };
-        streams.push_back({type, offset, length, {present, readStream}});
+        streams.push_back({type, offset, length, file.part(offset, length)});
     }
     return streams;
 }
 
-MediaPlaces placesIn(MetaDataParser& recording) {
-    switch (recording.getStreamType()) {
-    case Container::QuickTime: return findPlacesInMovie(recording.getStream());
-    case Container::Riff: return findPlacesInRIFF(recording.getStream());
+MediaPlaces placesIn(const ByteSource& file, Container::Type type) {
+    switch (type) {
+    case Container::QuickTime: return findPlacesInMovie(file);
+    case Container::Riff: return findPlacesInRIFF(file);
     default: return {};
     }
 }
@@ -109,18 +100,16 @@ void CopyCheck::requireNoTextStays(const MediaPlaces& media) const {
 
 void CopyCheck::requireClean(std::istream& copy, Container::Type type,
                              const std::function<void(std::uint64_t)>& advance) const {
-    const auto parser = openContainer(copy, type);
-    if (!parser)
-        throw RedactionError(Reason::CannotWrite, "the copy cannot be read back");
-    for (const StreamPart& stream : streamsIn(*parser))
+    const ByteSource bytes = ByteSource::stream(copy);
+    for (const StreamPart& stream : streamsIn(*openContainer(copy, type), bytes))
         requireCleanStream(stream);
     if (type == Container::RawStream)
         return;
     if (hasTexts())
-        requireCleanTexts(placesIn(*parser));
-    requireCleanBytes(*parser, advance);
+        requireCleanTexts(placesIn(bytes, type));
+    requireCleanBytes(bytes, type, advance);
     if (redaction_.removesCreator)
-        requireNeutralInfo(*parser);
+        requireNeutralInfo(bytes, type);
 }
 
 /// A redaction that is applied once more must find nothing to do.
@@ -143,20 +132,19 @@ void CopyCheck::requireCleanTexts(const MediaPlaces& media) const {
 }
 
 /// Streams that stay may contain the texts of kinds that are left out.
-void CopyCheck::requireCleanBytes(MetaDataParser& copy, const std::function<void(std::uint64_t)>& advance) const {
-    const ReadBytes read = readingFrom(copy.getStream());
-    const std::vector<ContainerItem> items = listTopLevel(copy.getStream(), copy.getStreamType());
-    requireReadable(copy.getStream());
-    for (const ContainerItem& item : items) {
-        const TextSearch& search = item.holdsMetaData() ? hidden_ : gone_;
-        if (const auto found = search.findIn(read, item.offset, item.end(), advance))
-            failFor("a text that was to go", item.type, *found);
+void CopyCheck::requireCleanBytes(const ByteSource& copy, Container::Type type,
+                                  const std::function<void(std::uint64_t)>& advance) const {
+    ItemWalk items(copy, type);
+    while (const auto item = items.next()) {
+        const TextSearch& search = item->holdsMetaData() ? hidden_ : gone_;
+        if (const auto found = search.findIn(copy, item->offset, item->end(), advance))
+            failFor("a text that was to go", item->type.text(), *found);
     }
 }
 
-void CopyCheck::requireNeutralInfo(MetaDataParser& copy) const {
+void CopyCheck::requireNeutralInfo(const ByteSource& copy, Container::Type type) const {
     const ZCAPHeader neutral = neutralRecordingInfo();
-    for (const ZCAPHeader& info : readRecordingInfo(copy))
+    for (const ZCAPHeader& info : readRecordingInfo(copy, type))
         if (std::memcmp(&info, &neutral, sizeof info) != 0)
             throw RedactionError(Reason::FoundInCopy, "the copy still says who made the recording");
 }

@@ -18,14 +18,14 @@ struct StreamPart {
     uuid type{};
     std::uint64_t offset = 0;   ///< of its header in the file
     std::uint64_t declared = 0; ///< bytes, header included
-    StreamSource::Bytes bytes;  ///< those that are there
+    ByteSource bytes;           ///< those that are there
 };
 
-/// The streams that readers find, in the order of their identifiers.
-std::vector<StreamPart> streamsIn(MetaDataParser& recording);
+/// Returns the streams that readers find, in the order of their identifiers.
+std::vector<StreamPart> streamsIn(MetaDataParser& recording, const ByteSource& file);
 
-/// Chapters, titles and captions of a container, and nothing for a stream file.
-MediaPlaces placesIn(MetaDataParser& recording);
+/// Returns chapters, titles and captions of a container, and nothing for a stream file.
+MediaPlaces placesIn(const ByteSource& file, Container::Type type);
 
 /// The recording info that tells of no program and no system.
 ZCAPHeader neutralRecordingInfo();
@@ -47,8 +47,9 @@ private:
     bool tells(const MediaText& place) const;
     void requireCleanStream(const StreamPart& stream) const;
     void requireCleanTexts(const MediaPlaces& media) const;
-    void requireCleanBytes(MetaDataParser& copy, const std::function<void(std::uint64_t)>& advance) const;
-    void requireNeutralInfo(MetaDataParser& copy) const;
+    void requireCleanBytes(const ByteSource& copy, Container::Type type,
+                           const std::function<void(std::uint64_t)>& advance) const;
+    void requireNeutralInfo(const ByteSource& copy, Container::Type type) const;
 
     const RecordingRedaction& redaction_;
     const Redaction& streams_;

@@ -14,7 +14,7 @@ constexpr std::size_t s_mediaPiece = 1 << 20;
 
 } // namespace
 
-MediaCopy::MediaCopy(ReadBytes read, std::vector<Blank> blanks) : read_(std::move(read)) {
+MediaCopy::MediaCopy(ByteSource file, std::vector<Blank> blanks) : file_(std::move(file)) {
     std::stable_sort(blanks.begin(), blanks.end(), [](const Blank& left, const Blank& right) {
         return left.offset != right.offset ? left.offset < right.offset : left.size > right.size;
     });
@@ -36,7 +36,7 @@ void MediaCopy::copy(std::uint64_t offset, std::uint64_t size, std::ostream& out
     const std::uint64_t end = offset + size;
     while (offset < end) {
         const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(end - offset, piece.size()));
-        const std::span<char> bytes(piece.data(), read_(offset, {piece.data(), wanted}));
+        const std::span<char> bytes(piece.data(), file_.read(offset, {piece.data(), wanted}));
         if (bytes.empty())
             throw std::system_error(EIO, std::generic_category(), "it ends at offset " + std::to_string(offset));
         blank(offset, bytes);

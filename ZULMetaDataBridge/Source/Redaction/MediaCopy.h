@@ -2,7 +2,7 @@
 
 // Copies the media part of a container byte for byte, but for what is blanked.
 
-#include "ZULMetaData/StreamExtent.h"
+#include "ZULMetaData/ByteSource.h"
 #include "ZULMetaDataBridge/Source/Redaction/MediaPlaces.h"
 
 #include <cstdint>
@@ -15,7 +15,7 @@ namespace ZULMetaData::detail {
 class MediaCopy {
 public:
     /// A blank inside of an earlier, larger one has no effect.
-    MediaCopy(ReadBytes read, std::vector<Blank> blanks);
+    MediaCopy(ByteSource file, std::vector<Blank> blanks);
 
     /// Returns whether the byte is copied as it is.
     bool isKept(std::uint64_t offset) const;
@@ -28,7 +28,7 @@ public:
 private:
     void blank(std::uint64_t offset, std::span<char> bytes) const;
 
-    ReadBytes read_;
+    ByteSource file_;
     std::vector<Blank> blanks_; ///< in the order of the file, without overlaps
 };
 

@@ -6,7 +6,6 @@
 #include "ZULMetaData/Containers/ContainerLayout.h"
 
 #include <cstdint>
-#include <istream>
 #include <string>
 #include <vector>
 
@@ -64,8 +63,8 @@ struct MediaPlaces {
 
 /// Throws `std::system_error` if the input cannot be read. A damaged container yields what was found up to the damage.
 ///@{
-MediaPlaces findPlacesInMovie(std::istream& movie);
-MediaPlaces findPlacesInRIFF(std::istream& file);
+MediaPlaces findPlacesInMovie(const ByteSource& movie);
+MediaPlaces findPlacesInRIFF(const ByteSource& file);
 ///@}
 
 } // namespace ZULMetaData::detail

@@ -14,33 +14,31 @@ namespace ZULMetaData::detail {
 
 namespace {
 
-constexpr std::array<std::string_view, 16> s_topTypes{"ftyp", "styp", "moov", "moof", "mfra", "mdat", "imda", "sidx",
-                                                      "ssix", "prft", "pdin", "meta", "meco", "emsg", "pnot", "PICT"};
-constexpr std::array<std::string_view, 12> s_containerAtoms{"moov", "trak", "mdia", "minf", "stbl", "edts",
-                                                            "dinf", "mvex", "moof", "traf", "mfra", "gmhd"};
-constexpr std::array<std::string_view, 4> s_unusedAtoms{"free", "skip", "wide", "junk"};
-constexpr std::array<std::string_view, 5> s_tableAtoms{"stsz", "stz2", "stsc", "stco", "co64"};
+constexpr std::array<FourCC, 16> s_topTypes{"ftyp", "styp", "moov", "moof", "mfra", "mdat", "imda", "sidx",
+                                            "ssix", "prft", "pdin", "meta", "meco", "emsg", "pnot", "PICT"};
+constexpr std::array<FourCC, 12> s_containerAtoms{"moov", "trak", "mdia", "minf", "stbl", "edts",
+                                                  "dinf", "mvex", "moof", "traf", "mfra", "gmhd"};
+constexpr std::array<FourCC, 4> s_unusedAtoms{"free", "skip", "wide", "junk"};
+constexpr std::array<FourCC, 5> s_tableAtoms{"stsz", "stz2", "stsc", "stco", "co64"};
 /// Tags that name programs, as paths show them.
 constexpr std::array<std::string_view, 3> s_programs{"/\xc2\xa9too",
                                                      "/\xc2\xa9"
                                                      "enc",
                                                      "/\xc2\xa9swr"};
-constexpr std::array<std::string_view, 9> s_phoneTags{"titl", "auth", "dscp", "perf", "gnre",
-                                                      "albm", "cprt", "yrrc", "coll"};
+constexpr std::array<FourCC, 9> s_phoneTags{"titl", "auth", "dscp", "perf", "gnre", "albm", "cprt", "yrrc", "coll"};
 
 /// The type of a `uuid` atom that holds XMP.
 constexpr std::string_view s_xmp = "\xbe\x7a\xcf\xcb\x97\xa9\x42\xe8\x9c\x71\x99\x94\x91\xe3\xaf\xac";
 
 class MovieWalk {
 public:
-    explicit MovieWalk(std::istream& movie) : movie_(movie), read_(readingFrom(movie)), total_(sizeOfInput(movie)) {}
+    explicit MovieWalk(const ByteSource& movie) : movie_(movie), atoms_(movie, Container::QuickTime) {}
 
     MediaPlaces run() {
-        const std::vector<ContainerItem> items = listTopLevel(movie_, Container::QuickTime);
-        requireReadable(movie_);
-        for (const ContainerItem& item : items)
-            if (!item.holdsMetaData() && !item.holdsRecordingInfo())
-                visitTop(item);
+        ItemWalk atoms = atoms_;
+        while (const auto atom = atoms.next())
+            if (!atom->holdsMetaData() && !atom->holdsRecordingInfo())
+                visitTop(*atom);
         for (const MovieTrack& track : tracks_)
             if (track.holdsTexts())
                 addTextTrack(track);
@@ -48,18 +46,18 @@ public:
     }
 
 private:
-    /// Only what lies inside of its parent.
-    std::vector<ContainerItem> itemsIn(std::uint64_t begin, std::uint64_t end) {
-        std::vector<ContainerItem> items = listAtoms(movie_, begin, end, total_);
-        requireReadable(movie_);
-        std::erase_if(items, [end](const ContainerItem& item) {
-            return item.size < item.headerSize || item.size > end - item.offset;
-        });
-        return items;
+    /// Passes over a child that does not lie inside its parent.
+    template <class Visit>
+    void forEachChild(const ContainerItem& parent, std::uint64_t begin, Visit visit) {
+        ItemWalk children = atoms_.inside(parent);
+        children.moveTo(begin);
+        while (const auto child = children.next())
+            if (child->size >= child->headerSize && child->fits(parent.end()))
+                visit(*child);
     }
 
     std::string payloadOf(const ContainerItem& item) {
-        return readBytes(read_, item.payloadOffset(), item.payloadSize(), s_longestRead);
+        return readBytes(movie_, item.payloadOffset(), item.payloadSize(), s_longestRead);
     }
 
     void visitTop(const ContainerItem& item);
@@ -78,9 +76,8 @@ private:
     void addTexts(MediaText::Role role, const ContainerItem& item, const std::string& path,
                   std::vector<std::string> texts);
 
-    std::istream& movie_;
-    ReadBytes read_;
-    std::uint64_t total_;
+    const ByteSource& movie_;
+    ItemWalk atoms_;
     std::uint64_t textSamples_ = 0; ///< of all tracks of texts so far, which may share their samples
     std::uint64_t textBytes_ = 0;
     MediaPlaces places_;
@@ -96,7 +93,7 @@ void MovieWalk::visitTop(const ContainerItem& item) {
         mediaData_.push_back(item);
     isFragmented_ = isFragmented_ || item.type == "moof";
     const bool isXMP =
-        item.type == "uuid" && readBytes(read_, item.payloadOffset(), s_xmp.size(), s_xmp.size()) == s_xmp;
+        item.type == "uuid" && readBytes(movie_, item.payloadOffset(), s_xmp.size(), s_xmp.size()) == s_xmp;
     if (isXMP)
         addTags(item, path);
     else if (isOneOf(item.type, s_topTypes))
@@ -122,7 +119,7 @@ void MovieWalk::visit(const ContainerItem& item, const std::string& path, MovieT
         const std::string header = payloadOf(item);
         track->id = bigEndianAt(header, header.starts_with('\1') ? 20 : 12, 4); // after two times of 64 or 32 bits
     } else if (isOneOf(item.type, s_tableAtoms) && track) {
-        track->tables.emplace(item.type, item);
+        track->tables.emplace(item.type.value, item);
     } else if (item.type == "cmov") {
         places_.obstacles.push_back({path, item.offset, "is compressed"});
     } else if (isOneOf(item.type, s_unusedAtoms)) {
@@ -133,22 +130,22 @@ void MovieWalk::visit(const ContainerItem& item, const std::string& path, MovieT
 void MovieWalk::visitChildren(const ContainerItem& item, const std::string& path, MovieTrack* track, int depth) {
     if (depth >= s_deepestLevel)
         return places_.obstacles.push_back({path, item.offset, "is nested too deeply"});
-    for (const ContainerItem& child : itemsIn(item.payloadOffset(), item.end()))
-        visit(child, path + '/' + shownType(child), track, depth + 1);
+    forEachChild(item, item.payloadOffset(),
+                 [&](const ContainerItem& child) { visit(child, path + '/' + shownType(child), track, depth + 1); });
 }
 
 /// References to chapters go where the chapters go.
 void MovieWalk::addReferences(const ContainerItem& item, const std::string& path) {
-    for (const ContainerItem& child : itemsIn(item.payloadOffset(), item.end())) {
+    forEachChild(item, item.payloadOffset(), [&](const ContainerItem& child) {
         if (child.type != "chap")
-            continue;
+            return;
         const std::string ids = payloadOf(child);
         for (std::size_t at = 0; at + 4 <= ids.size(); at += 4)
             chapterTracks_.insert(bigEndianAt(ids, at, 4));
         const bool isOnlyChild = child.size == item.payloadSize();
         places_.places.push_back(isOnlyChild ? blankedAtom(MediaPlace::Use::Text, path, item)
                                              : blankedAtom(MediaPlace::Use::Text, path + "/chap", child));
-    }
+    });
 }
 
 /// [version and flags: 4][component type: 4][handler: 4][reserved: 12][name]
@@ -171,7 +168,7 @@ void MovieWalk::addHandler(const ContainerItem& item, const std::string& path, M
 }
 
 void MovieWalk::addUnused(const ContainerItem& item, const std::string& path) {
-    if (!isBlank(read_, item))
+    if (!isBlank(movie_, item))
         places_.places.push_back(blankedAtom(MediaPlace::Use::Unused, path, item));
 }
 
@@ -225,7 +222,7 @@ std::vector<std::string> textsOfTag(const ContainerItem& item, const std::string
         return dataTexts(payload);
     if (item.type == "name")
         return {decodedText(payload)};
-    if (item.type.starts_with('\xa9'))
+    if (item.type.value >> 24 == 0xa9)
         return countedTexts(payload);
     if (isOneOf(item.type, s_phoneTags)) // [version and flags: 4][language: 2][text]
         return {decodedText(part(payload, 6))};
@@ -248,8 +245,8 @@ void MovieWalk::addTextsOf(const ContainerItem& item, const std::string& path, i
     const std::string payload = payloadOf(item);
     const std::uint64_t children = payload.size() < 8 ? item.end() : childrenOf(item, payload);
     if (children < item.end() && depth < s_deepestLevel) {
-        for (const ContainerItem& child : itemsIn(children, item.end()))
-            addTextsOf(child, path + '/' + shownType(child), depth + 1);
+        forEachChild(item, children,
+                     [&](const ContainerItem& child) { addTextsOf(child, path + '/' + shownType(child), depth + 1); });
     } else if (isOneOf(item.type, s_unusedAtoms)) {
         addUnused(item, path);
     } else if (item.type != "hdlr") {
@@ -273,8 +270,8 @@ std::string MovieWalk::whyUnreadable(const MovieTrack& track) {
     if (isFragmented_)
         return "has its texts in fragments";
     constexpr std::uint64_t most = 1 << 20; // nobody reads more texts
-    const auto isBounded = [this] { return textSamples_ <= most && textBytes_ <= total_; };
-    const bool isKnown = visitSamples(track, read_, [&](const SampleRange& sample) {
+    const auto isBounded = [this] { return textSamples_ <= most && textBytes_ <= movie_.size(); };
+    const bool isKnown = visitSamples(track, movie_, [&](const SampleRange& sample) {
         textBytes_ += sample.size;
         ++textSamples_;
         return isBounded();
@@ -291,7 +288,7 @@ bool MovieWalk::isInMediaData(const SampleRange& sample) const {
 
 std::string MovieWalk::whyNotRemovable(const MovieTrack& track) {
     std::vector<SampleRange> samples;
-    visitSamples(track, read_, [&samples](const SampleRange& sample) {
+    visitSamples(track, movie_, [&samples](const SampleRange& sample) {
         samples.push_back(sample);
         return true;
     });
@@ -309,7 +306,7 @@ bool MovieWalk::isSharedWithOtherTracks(const MovieTrack& track, const std::vect
     for (const MovieTrack& other : tracks_) {
         if (other.atom.offset == track.atom.offset)
             continue;
-        visitSamples(other, read_, [&](const SampleRange& sample) {
+        visitSamples(other, movie_, [&](const SampleRange& sample) {
             const auto after = ends.lower_bound(sample.offset + sample.size);
             isShared = sample.size > 0 && after != ends.begin() && std::prev(after)->second > sample.offset;
             return !isShared;
@@ -329,8 +326,8 @@ void MovieWalk::addTextTrack(const MovieTrack& track) {
         return places_.obstacles.push_back({track.path, track.atom.offset, obstacle});
     MediaPlace place = blankedAtom(MediaPlace::Use::Text, track.path, track.atom);
     std::vector<std::string> texts;
-    visitSamples(track, read_, [&](const SampleRange& sample) {
-        const auto found = textsOfSample(readBytes(read_, sample.offset, sample.size, s_longestRead));
+    visitSamples(track, movie_, [&](const SampleRange& sample) {
+        const auto found = textsOfSample(readBytes(movie_, sample.offset, sample.size, s_longestRead));
         texts.insert(texts.end(), found.begin(), found.end());
         place.blanks.push_back({sample.offset, sample.size, {}});
         return true;
@@ -342,7 +339,7 @@ void MovieWalk::addTextTrack(const MovieTrack& track) {
 
 } // namespace
 
-MediaPlaces findPlacesInMovie(std::istream& movie) {
+MediaPlaces findPlacesInMovie(const ByteSource& movie) {
     return MovieWalk(movie).run();
 }
 

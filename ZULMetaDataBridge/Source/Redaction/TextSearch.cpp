@@ -172,14 +172,14 @@ std::optional<std::size_t> TextSearch::findIn(std::string_view bytes) const {
     return std::nullopt;
 }
 
-std::optional<std::uint64_t> TextSearch::findIn(const ReadBytes& read, std::uint64_t begin, std::uint64_t end,
+std::optional<std::uint64_t> TextSearch::findIn(const ByteSource& file, std::uint64_t begin, std::uint64_t end,
                                                 const std::function<void(std::uint64_t)>& advance) const {
     if (needles_.empty())
         return std::nullopt;
     std::vector<char> piece(s_searchPiece + s_longestNeedle);
     for (std::uint64_t position = begin; position < end; position += s_searchPiece) {
         const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(piece.size(), end - position));
-        const std::string_view bytes(piece.data(), read(position, {piece.data(), wanted}));
+        const std::string_view bytes(piece.data(), file.read(position, {piece.data(), wanted}));
         if (bytes.empty())
             break;
         if (!isZero(bytes))

@@ -6,7 +6,7 @@
 // four different ones, is compared with whole texts and words only.
 
 #include "SharedDependencies/Callback.h"
-#include "ZULMetaData/StreamExtent.h"
+#include "ZULMetaData/ByteSource.h"
 
 #include <cstddef>
 #include <cstdint>
@@ -38,7 +38,7 @@ public:
 
     /// Returns where the first long text begins between `begin` and `end`, in UTF-8, Latin-1 or UTF-16 of either byte
     /// order. Calls `advance` with the number of bytes that were searched.
-    std::optional<std::uint64_t> findIn(const ReadBytes& read, std::uint64_t begin, std::uint64_t end,
+    std::optional<std::uint64_t> findIn(const ByteSource& file, std::uint64_t begin, std::uint64_t end,
                                         const std::function<void(std::uint64_t)>& advance) const;
 
 private:

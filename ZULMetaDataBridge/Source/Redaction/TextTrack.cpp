@@ -39,17 +39,17 @@ struct SampleTables {
 };
 
 /// Empty if there is no such table, or it is too large for what it says.
-std::string tableIn(const MovieTrack& track, const std::string& type, const ReadBytes& read) {
-    const auto found = track.tables.find(type);
+std::string tableIn(const MovieTrack& track, FourCC type, const ByteSource& file) {
+    const auto found = track.tables.find(type.value);
     if (found == track.tables.end() || found->second.payloadSize() > s_largestTable)
         return {};
-    return readBytes(read, found->second.payloadOffset(), found->second.payloadSize(), s_largestTable);
+    return readBytes(file, found->second.payloadOffset(), found->second.payloadSize(), s_largestTable);
 }
 
-std::optional<SampleTables> tablesOf(const MovieTrack& track, const ReadBytes& read) {
-    SampleTables tables{tableIn(track, "stsz", read), tableIn(track, "stsc", read), tableIn(track, "stco", read), 4};
+std::optional<SampleTables> tablesOf(const MovieTrack& track, const ByteSource& file) {
+    SampleTables tables{tableIn(track, "stsz", file), tableIn(track, "stsc", file), tableIn(track, "stco", file), 4};
     if (tables.offsets.empty())
-        tables = {tables.sizes, tables.chunks, tableIn(track, "co64", read), 8};
+        tables = {tables.sizes, tables.chunks, tableIn(track, "co64", file), 8};
     if (tables.sizes.size() < s_sizesOffset || tables.chunks.size() < s_entriesOffset ||
         tables.offsets.size() < s_entriesOffset || !tables.holdsSizes())
         return std::nullopt;
@@ -63,9 +63,9 @@ bool MovieTrack::holdsTexts() const {
     return std::find(handlers.begin(), handlers.end(), handler) != handlers.end();
 }
 
-bool visitSamples(const MovieTrack& track, const ReadBytes& read,
+bool visitSamples(const MovieTrack& track, const ByteSource& file,
                   const std::function<bool(const SampleRange&)>& visit) {
-    const auto tables = tablesOf(track, read);
+    const auto tables = tablesOf(track, file);
     if (!tables)
         return false;
     const bool isVisitedByChunk = tables->haveOneSize() && !track.holdsTexts(); // sound has millions of samples

@@ -16,8 +16,8 @@ struct MovieTrack {
     ContainerItem atom; ///< its `trak`
     std::string path;
     std::uint64_t id = 0;
-    std::string handler;                         ///< four characters, such as "text"
-    std::map<std::string, ContainerItem> tables; ///< `stsz`, `stsc`, `stco` and so on, by their types
+    std::string handler;                           ///< four characters, such as "text"
+    std::map<std::uint32_t, ContainerItem> tables; ///< `stsz`, `stsc`, `stco` and so on, by their types
 
     /// Returns whether its samples are texts.
     bool holdsTexts() const;
@@ -31,7 +31,8 @@ struct SampleRange {
 /// Calls `visit` with every sample, in the order of the track, until it returns false. Samples of one size that are no
 /// texts come as one range for each chunk. Returns false if its tables do not tell where they are;
 /// some of the samples may have been visited then.
-bool visitSamples(const MovieTrack& track, const ReadBytes& read, const std::function<bool(const SampleRange&)>& visit);
+bool visitSamples(const MovieTrack& track, const ByteSource& file,
+                  const std::function<bool(const SampleRange&)>& visit);
 
 /// Returns the text of one sample.
 std::vector<std::string> textsOfSample(std::string_view sample);

@@ -2,86 +2,70 @@
 
 // Validates a container around its streams: that every header makes sense and that the items fill the file.
 
-#include "ZULMetaData/Containers/WideRIFF.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaDataBridge/Source/Validation/FindingLog.h"
 #include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 #include "ZULMetaDataBridge/Source/Validation/StreamWalk.h"
-#include "ZULMetaDataBridge/Source/Validation/UntrustedInput.h"
 
 #include <cstdint>
 #include <map>
 #include <optional>
 #include <set>
 #include <string>
-#include <string_view>
 
 namespace ZULMetaData::detail {
 
 class ContainerWalk {
 public:
-    /// All must outlive the walk. Findings of the ignored codes are not made.
-    ContainerWalk(UntrustedInput& input, ValidationReport& report, const std::set<FindingCode>& ignored)
-        : input_(input), report_(report), log_(report, ignored) {}
+    /// The report and the ignored codes must outlive the walk. Findings of the ignored codes are not made.
+    ContainerWalk(const ByteSource& file, ValidationReport& report, const std::set<FindingCode>& ignored)
+        : file_(file), items_(file, report.container), report_(report), log_(report, ignored) {}
 
     void walkMovie();
-    void walkRIFF(const std::optional<WideRIFF>& wide);
+    void walkRIFF();
     void walkRawStream();
 
 private:
-    /// An atom or a chunk.
-    struct Item {
-        std::uint64_t start = 0;
-        std::uint64_t headerSize = 0;
-        std::uint64_t size = 0; ///< header included, as declared
-        std::uint32_t type = 0; ///< as `fourCC` gives it
-        bool isMarked = true;   ///< false where a 32-bit size announces the extended one without being its mark
-
-        std::uint64_t dataSize() const { return size - headerSize; }
-        bool fits(std::uint64_t limit) const { return size <= limit - start; }
-        std::uint64_t endUpTo(std::uint64_t limit) const { return fits(limit) ? start + size : limit; }
-    };
-
     /// What is around the streams of a metadata atom.
     struct Surroundings {
-        std::uint64_t end;
-        bool isWhole;     ///< whether that is the atom's own end, and not the file's
-        bool isReachable; ///< whether readers get to what follows
+        bool isWhole;     ///< whether the atom lies inside the file
+        bool isReachable; ///< whether readers find what follows
     };
+
+    /// What the walk along a container can do after an item.
+    enum class Next { GoesOn, Stops };
 
     template <class... Parts>
     void add(FindingCode code, const std::string& place, std::uint64_t offset, const Parts&... parts) {
         log_.add(report_.findings, code, place, offset, parts...);
     }
 
-    std::optional<Item> readTopAtom();
-    std::optional<Item> readChildAtom(std::uint64_t end);
-    bool readExtendedSize(Item& atom, std::uint64_t end, std::string_view around);
-    bool hasHeader(std::uint64_t end, std::string_view around);
-    bool hasUsableSize(const Item& atom);
-    void reportOverrun(const Item& item);
-    void reportForeignChild(const Item& child);
+    std::optional<ContainerItem> nextItem(ItemWalk& items, const std::string& around);
+    Next checkSize(const ContainerItem& atom);
+    void reportOverrun(const ContainerItem& item);
+    void reportForeignChild(const ContainerItem& child);
+    void checkPad(const ContainerItem& chunk, const ItemWalk& chunks);
+    void checkWidth(const ContainerItem& chunk);
 
-    bool visitTopAtom(const Item& atom);
-    void checkRecordingInfo(const Item& atom);
-    void walkMetaDataAtom(Surroundings around);
-    bool visitChildAtom(const Item& child, Surroundings& around);
-    bool walkStreamAtom(const Item& atom, Surroundings& around);
-    bool isStreamAtomAt(std::uint64_t position, std::uint64_t end);
-    bool endsWithoutItsTail(const Item& atom, std::uint64_t wholeEnd, const Surroundings& around) const;
+    Next visitTopAtom(const ContainerItem& atom);
+    void checkRecordingInfo(const ContainerItem& atom);
+    void walkMetaDataAtom(ItemWalk children, Surroundings around);
+    Next visitChildAtom(const ContainerItem& child, ItemWalk& children, Surroundings& around);
+    std::optional<std::uint64_t> walkStreamAtom(const ContainerItem& atom, const ItemWalk& children,
+                                                const Surroundings& around);
+    bool endsWithoutItsTail(const ContainerItem& atom, std::uint64_t wholeEnd, std::uint64_t end) const;
 
-    std::optional<Item> readChunk(std::uint64_t end, std::string_view around);
-    bool visitTopChunk(const Item& chunk);
-    bool walkMetaDataChunk(std::uint64_t end);
-    void moveBehindWideChunk(const Item& chunk, const WideRIFF& wide);
-    void moveBehindChunk(const Item& chunk, std::uint64_t end);
+    Next visitTopChunk(const ContainerItem& chunk);
+    Next walkMetaDataChunk(ItemWalk children);
 
-    void noteMetaData(const Item& item);
-    StreamWalk::Outcome walkStream(std::uint64_t declared, std::uint64_t end, bool isReachable,
+    void noteMetaData(const ContainerItem& item);
+    StreamWalk::Outcome walkStream(std::uint64_t offset, std::uint64_t declared, std::uint64_t end, bool isReachable,
                                    StreamWalk::IsNextStream isNextStream);
     void noteKind(StreamReport& stream);
     void list(StreamReport stream);
 
-    UntrustedInput& input_;
+    ByteSource file_;
+    ItemWalk items_;
     ValidationReport& report_;
     FindingLog log_;
     std::map<uuid, std::uint64_t> offsetOfKind_; ///< of the listed streams that readers reach

@@ -9,12 +9,13 @@
 
 #include "../../../Platform/FileLocation.h"
 #include "../../../SharedDependencies/Export.h"
-#include "../../../ZULMetaData/ZULMMetaDataParser.h"
+#include "../../../ZULMetaData/ByteSource.h"
+#include "../../../ZULMetaData/Containers/ContainerType.h"
+#include "../../../ZULMetaData/ZULMMetaDataUUIDs.h"
 
 #include <array>
 #include <cstddef>
 #include <cstdint>
-#include <istream>
 #include <optional>
 #include <set>
 #include <string>
@@ -197,18 +198,13 @@ struct ZULMETADATA_API ValidationReport {
     std::vector<Finding> allFindings() const;            ///< in the order of their offsets
 };
 
-/// Takes the file for what `recognizeContainer` says. Throws `std::runtime_error` if the file cannot be read or can
-/// hold no metadata. Findings of the ignored codes are neither listed nor counted.
+/// Takes the file for what `recognizeContainer` says. Findings of the ignored codes are neither listed nor counted.
+/// Throws `std::system_error` if the file cannot be opened or read, and `std::runtime_error` if it can hold no
+/// metadata.
 ///@{
-ZULMETADATA_API ValidationReport validateRecording(const FileLocation& file);
-ZULMETADATA_API ValidationReport validateRecording(const FileLocation& file, const std::set<FindingCode>& ignored);
-///@}
-
-/// Throws `std::runtime_error` for a stream that cannot be read and for the type `Unknown`.
-///@{
-ZULMETADATA_API ValidationReport validateRecording(std::istream& stream, Container::Type type);
-ZULMETADATA_API ValidationReport validateRecording(std::istream& stream, Container::Type type,
-                                                   const std::set<FindingCode>& ignored);
+ZULMETADATA_API ValidationReport validateRecording(const FileLocation& file, const std::set<FindingCode>& ignored = {});
+ZULMETADATA_API ValidationReport validateRecording(const ByteSource& file, Container::Type type,
+                                                   const std::set<FindingCode>& ignored = {});
 ///@}
 
 } // namespace ZULMetaData

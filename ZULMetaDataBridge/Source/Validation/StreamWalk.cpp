@@ -2,16 +2,16 @@
 
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/EntryTexts.h"
-#include "ZULMetaDataBridge/Source/MetaDataKinds.h"
+#include "ZULMetaDataBridge/Source/KindEntries.h"
 
 #include <algorithm>
-#include <array>
 #include <cmath>
 #include <concepts>
 #include <cstddef>
+#include <span>
 #include <string_view>
+#include <system_error>
 #include <tuple>
-#include <vector>
 
 namespace ZULMetaData::detail {
 
@@ -21,7 +21,7 @@ constexpr std::uint32_t s_timeSize = sizeof(double);
 constexpr std::uint32_t s_sizeSize = sizeof(std::uint32_t);
 constexpr std::uint32_t s_countSize = sizeof(std::uint32_t);
 
-/// The longest character of UTF-8, which may begin at the end of one piece of a text and end in the next.
+/// The longest character of UTF-8 in bytes.
 constexpr std::size_t s_longestCharacter = 4;
 
 /// What one image of a file of `total` bytes may take, encoded and decoded: of the 16 MiB that the whole program may
@@ -48,28 +48,32 @@ constexpr double s_durationTolerance = 0.01;
 
 } // namespace
 
-StreamWalk::Outcome StreamWalk::run() {
-    report_.offset = input_.position();
-    report_.presentBytes = end_ - report_.offset;
-    if (!readHeader())
-        return {end_, false};
-    outcome_ = {input_.position(), false};
-    report_.readableBytes = sizeof(MetaDataHeader);
-    const bool isWalked =
-        isVersionKnown() && RecordedKinds::visit(report_.type, [this]<class Kind>() { walkKind<Kind>(); });
-    if (!isWalked)
-        walkUnknown();
-    reportBeyondDuration();
-    return outcome_;
+std::string_view StreamWalk::Fields::peek(std::uint64_t size) const {
+    const std::string_view bytes = reader_.at(position_, size);
+    if (bytes.size() < size)
+        throw std::system_error(std::make_error_code(std::errc::io_error),
+                                "cannot be read at offset " + std::to_string(position_) + " of a stream");
+    return bytes;
 }
 
-bool StreamWalk::readHeader() {
-    if (report_.presentBytes < sizeof(MetaDataHeader)) {
-        add(FindingCode::ShortHeader, report_.offset, "the stream has ", report_.presentBytes,
-            " bytes, fewer than the ", sizeof(MetaDataHeader), " of a header");
-        return false;
+StreamWalk::Outcome StreamWalk::run() {
+    report_.presentBytes = size_;
+    wholeEnd_ = entries_.header() ? s_metaDataHeaderSize : size_;
+    if (entries_.header()) {
+        noteHeader();
+        checkVersion();
+        walkEntries();
+        reportBeyondDuration();
+    } else {
+        add(FindingCode::ShortHeader, 0, "the stream has ", size_, " bytes, fewer than the ", s_metaDataHeaderSize,
+            " of a header");
     }
-    const auto header = input_.read<MetaDataHeader>();
+    return {report_.offset + wholeEnd_, isTailLeftOut_};
+}
+
+void StreamWalk::noteHeader() {
+    const MetaDataHeader& header = *entries_.header();
+    report_.readableBytes = s_metaDataHeaderSize;
     report_.type = header.uuid;
     report_.version = header.version;
     report_.fixedEntrySize = header.fixedEntrySize;
@@ -77,234 +81,226 @@ bool StreamWalk::readHeader() {
     report_.kind = kind ? kind->name : std::string_view();
     place_ = report_.name();
     if (!kind)
-        add(FindingCode::UnknownKind, report_.offset, "no kind of stream is registered under this identifier");
-    return true;
+        add(FindingCode::UnknownKind, 0, "no kind of stream is registered under this identifier");
 }
 
-bool StreamWalk::isVersionKnown() {
-    const std::uint64_t offset = report_.offset + offsetof(MetaDataHeader, version);
+void StreamWalk::checkVersion() {
+    constexpr std::uint64_t position = offsetof(MetaDataHeader, version);
     const MetaDataKind* kind = findMetaDataKind(report_.type);
     if (report_.version < 1)
-        add(FindingCode::BadVersion, offset, "version ", report_.version, " is below 1: readers refuse the stream");
+        add(FindingCode::BadVersion, position, "version ", report_.version, " is below 1: readers refuse the stream");
     else if (kind && report_.version > kind->currentVersion)
-        add(FindingCode::NewerVersion, offset, "version ", report_.version, " is newer than ", kind->currentVersion,
+        add(FindingCode::NewerVersion, position, "version ", report_.version, " is newer than ", kind->currentVersion,
             ", the newest that is known: readers refuse the stream");
-    return kind && report_.version >= 1 && report_.version <= kind->currentVersion;
 }
 
-bool StreamWalk::hasEntriesOf(std::uint32_t expected) {
-    const bool isSo = report_.fixedEntrySize == expected;
-    if (!isSo)
-        add(FindingCode::EntrySizeMismatch, report_.offset + offsetof(MetaDataHeader, fixedEntrySize),
-            "the header says that entries take ", report_.fixedEntrySize, " bytes, but those of this kind take ",
-            expected, expected == 0 ? " (each carries its own size)" : "", ": they were not read");
-    return isSo;
+void StreamWalk::walkEntries() {
+    const auto walk = [this]<class Kind>() { walkKind<Kind>(); };
+    if (!isKnownStream(*entries_.header()) || !RecordedKinds::visit(report_.type, walk))
+        walkUnknown();
 }
 
 template <class Kind>
 void StreamWalk::walkKind() {
     using Value = typename Kind::Value;
-    if (!hasEntriesOf(metaDataFixedEntrySize<Value>()))
-        return;
-    if constexpr (FixedSizeValue<Value>) {
-        walkFixed(metaDataFixedEntrySize<Value>());
+    constexpr std::uint64_t position = offsetof(MetaDataHeader, fixedEntrySize);
+    if (const std::uint32_t expected = metaDataFixedEntrySize<Value>(); report_.fixedEntrySize != expected) {
+        add(FindingCode::EntrySizeMismatch, position, "the header says that entries take ", report_.fixedEntrySize,
+            " bytes, but those of this kind take ", expected, expected == 0 ? " (each carries its own size)" : "",
+            ": they were not read");
+    } else if constexpr (FixedSizeValue<Value>) {
+        walkFixed();
     } else if constexpr (std::same_as<Value, std::string>) {
-        walkSized(s_timeSize, [this](const Entry& entry) { return checkString(entry); });
+        walkSized(s_timeSize, [this](const auto& entry, Fields& fields) { return checkString(entry, fields); });
     } else if constexpr (std::same_as<Value, CursorImage>) {
         const CursorImageSchema schema(report_.version);
         CursorImage image;
         double time = 0;
         Record record{image, time};
         const std::uint32_t baseSize = schema.GetSizeOfSchemaFieldSteps(schema.GetBaseInfoSteps(), record);
-        walkSized(baseSize - s_sizeSize, [this](const Entry& entry) { return checkCursorImage(entry); });
+        walkSized(baseSize - s_sizeSize,
+                  [this](const auto& entry, Fields& fields) { return checkCursorImage(entry, fields); });
     } else {
         constexpr std::uint32_t neededTexts = std::tuple_size_v<decltype(Kind::fields)>;
-        walkSized(s_countSize, [this](const Entry& entry) { return checkList(entry, neededTexts); });
+        walkSized(s_countSize,
+                  [this](const auto& entry, Fields& fields) { return checkList(entry, fields, neededTexts); });
     }
 }
 
-/// Of a kind or version whose values nobody here knows: the header tells the layout of its entries.
+/// Walks over entries of a kind or version whose values nobody here knows. The header tells their layout.
 void StreamWalk::walkUnknown() {
     if (report_.fixedEntrySize == 0)
-        walkSized(1, [](const Entry&) { return true; });
+        walkSized(1, [](const StreamEntry&, Fields&) { return true; });
     else if (report_.fixedEntrySize >= s_timeSize)
-        walkFixed(report_.fixedEntrySize);
+        walkFixed();
     else
-        add(FindingCode::EntrySizeMismatch, report_.offset + offsetof(MetaDataHeader, fixedEntrySize),
+        add(FindingCode::EntrySizeMismatch, offsetof(MetaDataHeader, fixedEntrySize),
             "the header says that entries take ", report_.fixedEntrySize, " bytes, too few for a time");
 }
 
-void StreamWalk::walkFixed(std::uint64_t entrySize) {
-    std::uint64_t& wholeEnd = outcome_.wholeEnd;
-    while (end_ - wholeEnd >= entrySize) {
-        noteTime(wholeEnd, input_.read<double>());
+void StreamWalk::walkFixed() {
+    while (const auto entry = entries_.next()) {
+        noteTime(entry->offset, Fields(entries_.reader(), *entry).next<double>());
         ++report_.wholeEntries;
-        wholeEnd += entrySize;
-        input_.moveTo(wholeEnd);
     }
-    report_.readableBytes = wholeEnd - report_.offset;
-    if (wholeEnd < end_ && !isTailLeftOut())
-        add(FindingCode::TornEntry, wholeEnd, "the last entry has ", end_ - wholeEnd, " of ", entrySize, " bytes");
+    wholeEnd_ = report_.readableBytes = entries_.wholeBytes();
+    noteEnd();
+    if (wholeEnd_ < size_ && !isTailLeftOut_)
+        add(FindingCode::TornEntry, wholeEnd_, "the last entry has ", size_ - wholeEnd_, " of ", report_.fixedEntrySize,
+            " bytes");
 }
 
 template <class Check>
 void StreamWalk::walkSized(std::uint32_t minimum, Check check) {
-    std::uint64_t& wholeEnd = outcome_.wholeEnd;
-    while (wholeEnd < end_) {
-        Entry entry{wholeEnd, end_};
-        std::uint32_t size = 0;
-        if (end_ - entry.start >= s_sizeSize)
-            size = input_.read<std::uint32_t>();
-        if (size < minimum || end_ - input_.position() < size) {
-            if (!isTailLeftOut())
-                reportFrame(entry, size, minimum);
-            return; // what follows cannot be told apart
-        }
-        entry.end = input_.position() + size;
-        const bool isReadable = report_.readableBytes == entry.start - report_.offset;
-        wholeEnd = entry.end;
-        if (check(entry)) {
-            ++report_.wholeEntries;
-            if (isReadable)
-                report_.readableBytes = wholeEnd - report_.offset;
-        }
-        input_.moveTo(wholeEnd);
+    for (auto entry = entries_.next(); entry && entry->size >= s_sizeSize + minimum; entry = entries_.next()) {
+        Fields fields(entries_.reader(), *entry);
+        fields.skip(s_sizeSize);
+        const bool isReadable = report_.readableBytes == entry->offset;
+        wholeEnd_ = entry->end();
+        if (!check(*entry, fields))
+            continue;
+        ++report_.wholeEntries;
+        if (isReadable)
+            report_.readableBytes = wholeEnd_;
     }
+    noteEnd();
+    if (wholeEnd_ < size_ && !isTailLeftOut_)
+        reportFrame(wholeEnd_, minimum); // what follows cannot be told apart
 }
 
-void StreamWalk::reportFrame(const Entry& entry, std::uint32_t size, std::uint32_t minimum) {
-    const std::uint64_t left = entry.end - entry.start;
+void StreamWalk::reportFrame(std::uint64_t position, std::uint32_t minimum) {
+    const std::uint64_t left = size_ - position;
+    const std::uint32_t size = entries_.reader().numberAt<std::uint32_t>(position).value_or(0);
     if (left < s_sizeSize)
-        add(FindingCode::TornEntry, entry.start, "the last entry has ", left, " bytes, too few for its size");
+        add(FindingCode::TornEntry, position, "the last entry has ", left, " bytes, too few for its size");
     else if (size == 0)
-        add(FindingCode::ZeroEntrySize, entry.start, "the entry says that it has 0 bytes");
+        add(FindingCode::ZeroEntrySize, position, "the entry says that it has 0 bytes");
     else if (size < minimum)
-        add(FindingCode::EntryTooSmall, entry.start, "the entry says that ", size,
-            " bytes follow its size, but at least ", minimum, " must");
+        add(FindingCode::EntryTooSmall, position, "the entry says that ", size, " bytes follow its size, but at least ",
+            minimum, " must");
     else if (left < std::uint64_t{s_sizeSize} + minimum)
-        add(FindingCode::TornEntry, entry.start, "the last entry has ", left, " of at least ", s_sizeSize + minimum,
+        add(FindingCode::TornEntry, position, "the last entry has ", left, " of at least ", s_sizeSize + minimum,
             " bytes");
     else
-        add(FindingCode::EntryBeyondEnd, entry.start, "the entry says that ", size, " bytes follow its size, but only ",
+        add(FindingCode::EntryBeyondEnd, position, "the entry says that ", size, " bytes follow its size, but only ",
             left - s_sizeSize, " do");
 }
 
-bool StreamWalk::isTailLeftOut() {
-    outcome_.isTailLeftOut = isNextStream_(outcome_.wholeEnd);
-    if (outcome_.isTailLeftOut)
-        report_.presentBytes = outcome_.wholeEnd - report_.offset;
-    return outcome_.isTailLeftOut;
+/// Finds out whether a torn entry at the end was never copied.
+void StreamWalk::noteEnd() {
+    isTailLeftOut_ = wholeEnd_ < size_ && isNextStream_(report_.offset + wholeEnd_);
+    if (isTailLeftOut_)
+        report_.presentBytes = wholeEnd_;
 }
 
-bool StreamWalk::checkString(const Entry& entry) {
-    noteTime(entry.start, input_.read<double>());
-    checkText(entry.end - input_.position());
+bool StreamWalk::checkString(const StreamEntry& entry, Fields& fields) {
+    noteTime(entry.offset, fields.next<double>());
+    checkText(fields);
     return true;
 }
 
 /// Every text repeats the entry's time. They are in no encoding in particular.
-bool StreamWalk::checkList(const Entry& entry, std::uint32_t neededTexts) {
-    const auto count = input_.read<std::uint32_t>();
-    const std::uint64_t room = (entry.end - input_.position()) / (s_sizeSize + s_timeSize);
+bool StreamWalk::checkList(const StreamEntry& entry, Fields& fields, std::uint32_t neededTexts) {
+    const auto count = fields.next<std::uint32_t>();
+    const std::uint64_t room = (fields.left()) / (s_sizeSize + s_timeSize);
     if (count > room) {
-        add(FindingCode::ListCount, entry.start, "the list counts ", count, " texts, but has room for ", room,
+        add(FindingCode::ListCount, entry.offset, "the list counts ", count, " texts, but has room for ", room,
             " at most");
         return false;
     }
     for (std::uint32_t index = 0; index < count; ++index)
-        if (!checkListText(entry, index))
+        if (!checkListText(entry, fields, index))
             return false;
-    if (input_.position() != entry.end) {
-        add(FindingCode::ListTotal, entry.start, "the list's total counts ", entry.end - input_.position(),
+    if (fields.left() > 0) {
+        add(FindingCode::ListTotal, entry.offset, "the list's total counts ", fields.left(),
             " bytes after its last text");
         return false;
     }
     if (count < neededTexts)
-        add(FindingCode::TooFewTexts, entry.start, "the list has ", count, " texts, but its kind needs ", neededTexts);
+        add(FindingCode::TooFewTexts, entry.offset, "the list has ", count, " texts, but its kind needs ", neededTexts);
     return true;
 }
 
-bool StreamWalk::checkListText(const Entry& entry, std::uint32_t index) {
-    const std::uint64_t start = input_.position();
-    if (entry.end - start < s_sizeSize + s_timeSize) {
-        add(FindingCode::ListTotal, entry.start, "the list's total ends before text ", index + 1);
+bool StreamWalk::checkListText(const StreamEntry& entry, Fields& fields, std::uint32_t index) {
+    const std::uint64_t start = fields.position();
+    if (fields.left() < s_sizeSize + s_timeSize) {
+        add(FindingCode::ListTotal, entry.offset, "the list's total ends before text ", index + 1);
         return false;
     }
-    const auto size = input_.read<std::uint32_t>();
+    const auto size = fields.next<std::uint32_t>();
     if (size < s_timeSize) {
         add(FindingCode::EntryTooSmall, start, "text ", index + 1, " says that ", size,
             " bytes follow its size, but at least ", s_timeSize, " must");
         return false;
     }
-    if (size > entry.end - input_.position()) {
-        add(FindingCode::ListTotal, entry.start, "the list's total ends inside text ", index + 1, ", which has ", size,
+    if (size > fields.left()) {
+        add(FindingCode::ListTotal, entry.offset, "the list's total ends inside text ", index + 1, ", which has ", size,
             " bytes after its size");
         return false;
     }
-    const auto time = input_.read<double>();
+    const auto time = fields.next<double>();
     if (index == 0 || !std::isfinite(time))
-        noteTime(index == 0 ? entry.start : start, time);
-    input_.moveTo(start + s_sizeSize + size);
+        noteTime(index == 0 ? entry.offset : start, time);
+    fields.skip(size - s_timeSize);
     return true;
 }
 
-bool StreamWalk::checkCursorImage(const Entry& entry) {
+bool StreamWalk::checkCursorImage(const StreamEntry& entry, Fields& fields) {
     const CursorImageSchema schema(report_.version);
     CursorImage image;
     double time = 0;
     Record record{image, time};
     for (const SchemaFieldStep& step : schema.GetBaseInfoSteps().subspan(1)) {
         const FieldInfo field = step.fieldGetter(record);
-        input_.read(field.data, field.size);
+        fields.read(field.data, field.size);
     }
-    noteTime(entry.start, time);
-    if (record.justMetadataSize != entry.end - input_.position()) {
-        add(FindingCode::CursorSizes, entry.start, "the record says that its data part has ", record.justMetadataSize,
-            " bytes, but its own size leaves ", entry.end - input_.position());
+    noteTime(entry.offset, time);
+    if (record.justMetadataSize != fields.left()) {
+        add(FindingCode::CursorSizes, entry.offset, "the record says that its data part has ", record.justMetadataSize,
+            " bytes, but its own size leaves ", fields.left());
         return false;
     }
-    return checkCursorData(entry, schema, record);
+    return checkCursorData(entry, fields, schema, record);
 }
 
-bool StreamWalk::checkCursorData(const Entry& entry, const CursorImageSchema& schema, Record& record) {
+bool StreamWalk::checkCursorData(const StreamEntry& entry, Fields& fields, const CursorImageSchema& schema,
+                                 Record& record) {
     bool hasImage = false;
     for (const SchemaFieldStep& step : schema.GetDataSteps()) {
         if (!step.existsIn(report_.version) || !step.condition(record))
             continue;
         const bool isImage = step.fieldGetter == schema.GetImageFieldInfoFn(); // which would allocate the image
         const FieldInfo field = isImage ? FieldInfo{nullptr, schema.GetImageSize(record)} : step.fieldGetter(record);
-        const std::uint64_t left = entry.end - input_.position();
+        const std::uint64_t left = fields.left();
         if (field.size > left) {
-            add(isImage ? FindingCode::ImageBeyondEntry : FindingCode::CursorData, entry.start, "the record has ", left,
-                " bytes left for its field ", step.name, ", which takes ", field.size);
+            add(isImage ? FindingCode::ImageBeyondEntry : FindingCode::CursorData, entry.offset, "the record has ",
+                left, " bytes left for its field ", step.name, ", which takes ", field.size);
             return false;
         }
         if (isImage)
-            checkImage(field.size);
+            checkImage(fields, field.size);
         else
-            input_.read(field.data, field.size);
+            fields.read(field.data, field.size);
         hasImage |= isImage && field.size > 0;
     }
-    noteCursor(entry.start, record.image.uniqueId, hasImage);
-    if (input_.position() < entry.end)
-        add(FindingCode::LeftoverBytes, input_.position(), "the record has ", entry.end - input_.position(),
+    noteCursor(entry.offset, record.image.uniqueId, hasImage);
+    if (fields.left() > 0)
+        add(FindingCode::LeftoverBytes, fields.position(), "the record has ", fields.left(),
             " bytes after its last known field");
     return true;
 }
 
-void StreamWalk::checkImage(std::uint32_t size) {
-    if (size == 0)
-        return;
-    const std::uint64_t offset = input_.position();
+void StreamWalk::checkImage(Fields& fields, std::uint32_t size) {
+    const std::uint64_t position = fields.position();
     if (size > s_largestStoredImage) {
-        input_.moveTo(offset + size);
-        add(FindingCode::AbsurdImage, offset, "the image takes ", size,
+        add(FindingCode::AbsurdImage, position, "the image takes ", size,
             " bytes, far more than a cursor: it was not read");
-        return;
+    } else if (size > 0) {
+        const std::string_view bytes = fields.peek(size);
+        const std::span encoded(reinterpret_cast<const std::uint8_t*>(bytes.data()), bytes.size());
+        reportImage(position, size, Image::checkEncodedBytes(encoded, memoryForImage(fileSize_) - size));
     }
-    std::vector<std::uint8_t> encoded(size);
-    input_.read(encoded.data(), size);
-    reportImage(offset, size, Image::checkEncodedBytes(encoded, memoryForImage(input_.total()) - size));
+    fields.skip(size);
 }
 
 void StreamWalk::reportImage(std::uint64_t offset, std::uint32_t size, const EncodedImageCheck& check) {
@@ -326,21 +322,19 @@ void StreamWalk::reportImage(std::uint64_t offset, std::uint32_t size, const Enc
             check.surplusBytes, " of its ", size, " bytes");
 }
 
-void StreamWalk::checkText(std::uint64_t size) {
-    std::array<char, 16384> piece;
-    std::size_t held = 0; // bytes of a character that the last piece cut
-    while (size > 0) {
-        const auto count = static_cast<std::size_t>(std::min<std::uint64_t>(size, piece.size() - held));
-        input_.read(piece.data() + held, count);
-        size -= count;
-        const std::string_view text(piece.data(), held + count);
-        const std::size_t valid = validUTF8Length(text);
-        held = text.size() - valid;
-        if (held >= s_longestCharacter || (size == 0 && held > 0)) {
-            add(FindingCode::NotUTF8, input_.position() - held, "the text is not UTF-8 from here on");
+/// Checks in pieces. A character may begin at the end of one piece and end in the next.
+void StreamWalk::checkText(Fields& fields) {
+    constexpr std::uint64_t longestPiece = 16384;
+    while (fields.left() > 0) {
+        const std::string_view piece = fields.peek(std::min(fields.left(), longestPiece));
+        const std::size_t valid = validUTF8Length(piece);
+        const std::size_t rest = piece.size() - valid;
+        const bool isLast = piece.size() == fields.left();
+        fields.skip(valid);
+        if (rest >= s_longestCharacter || (isLast && rest > 0)) {
+            add(FindingCode::NotUTF8, fields.position(), "the text is not UTF-8 from here on");
             return;
         }
-        std::copy_n(piece.begin() + static_cast<std::ptrdiff_t>(valid), held, piece.begin());
     }
 }
 

@@ -4,16 +4,19 @@
 
 #include "Platform/Image.h"
 #include "ZULMetaData/CursorImageSchema.h"
+#include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaDataBridge/Source/Validation/FindingLog.h"
 #include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
-#include "ZULMetaDataBridge/Source/Validation/UntrustedInput.h"
 
+#include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <functional>
 #include <limits>
 #include <optional>
 #include <set>
 #include <string>
+#include <string_view>
 #include <utility>
 
 namespace ZULMetaData::detail {
@@ -28,61 +31,87 @@ public:
         bool isTailLeftOut;     ///< whether the next stream begins there, so that a torn entry was never copied
     };
 
-    /// The stream stands at the position of `input` and ends at `end`, which is in the file. `duration` is the movie's
-    /// in seconds, if it is known.
-    StreamWalk(UntrustedInput& input, FindingLog& log, StreamReport& report, std::uint64_t end,
+    /// `report` tells where the stream begins in the file, which has `fileSize` bytes. `duration` is the movie's in
+    /// seconds, if it is known.
+    StreamWalk(const ByteSource& stream, std::uint64_t fileSize, FindingLog& log, StreamReport& report,
                std::optional<double> duration, IsNextStream isNextStream)
-        : input_(input), log_(log), report_(report), end_(end), duration_(duration),
+        : entries_(stream), fileSize_(fileSize), size_(stream.size()), log_(log), report_(report), duration_(duration),
           isNextStream_(std::move(isNextStream)) {}
 
     Outcome run();
 
 private:
-    struct Entry {
-        std::uint64_t start;
-        std::uint64_t end;
+    /// The fields of one entry, read one after the other. Throws `std::system_error` if bytes that must be there do not
+    /// come.
+    class Fields {
+    public:
+        Fields(ByteReader& reader, const StreamEntry& entry)
+            : reader_(reader), position_(entry.offset), end_(entry.end()) {}
+
+        std::uint64_t position() const { return position_; }
+        std::uint64_t left() const { return end_ - position_; }
+        std::string_view peek(std::uint64_t size) const;
+        void skip(std::uint64_t bytes) { position_ += bytes; }
+        void read(void* field, std::size_t size) {
+            std::memcpy(field, peek(size).data(), size);
+            skip(size);
+        }
+
+        template <class Number>
+        Number next() {
+            Number number;
+            read(&number, sizeof number);
+            return number;
+        }
+
+    private:
+        ByteReader& reader_;
+        std::uint64_t position_; ///< in the stream
+        std::uint64_t end_;
     };
 
     template <class... Parts>
-    void add(FindingCode code, std::uint64_t offset, const Parts&... parts) {
-        log_.add(report_.findings, code, place_, offset, parts...);
+    void add(FindingCode code, std::uint64_t position, const Parts&... parts) {
+        log_.add(report_.findings, code, place_, report_.offset + position, parts...);
     }
 
-    bool readHeader();
-    bool isVersionKnown();
-    bool hasEntriesOf(std::uint32_t expected);
+    void noteHeader();
+    void checkVersion();
+    void walkEntries();
 
     template <class Kind>
     void walkKind();
     void walkUnknown();
-    void walkFixed(std::uint64_t entrySize);
+    void walkFixed();
 
-    /// Entries that begin with the number of bytes behind it, of which there must be `minimum`. `check` stands behind
-    /// that number and gives whether the entry fits its own sizes.
+    /// Walks over entries that begin with the number of bytes that follow, of which there must be `minimum`. `check`
+    /// gets the fields after that number and returns whether the entry fits its own sizes.
     template <class Check>
     void walkSized(std::uint32_t minimum, Check check);
-    void reportFrame(const Entry& entry, std::uint32_t size, std::uint32_t minimum);
-    bool isTailLeftOut();
+    void reportFrame(std::uint64_t position, std::uint32_t minimum);
+    void noteEnd();
 
-    bool checkString(const Entry& entry);
-    bool checkList(const Entry& entry, std::uint32_t neededTexts);
-    bool checkListText(const Entry& entry, std::uint32_t index);
-    bool checkCursorImage(const Entry& entry);
-    bool checkCursorData(const Entry& entry, const CursorImageSchema& schema, Record& record);
-    void checkImage(std::uint32_t size);
+    bool checkString(const StreamEntry& entry, Fields& fields);
+    bool checkList(const StreamEntry& entry, Fields& fields, std::uint32_t neededTexts);
+    bool checkListText(const StreamEntry& entry, Fields& fields, std::uint32_t index);
+    bool checkCursorImage(const StreamEntry& entry, Fields& fields);
+    bool checkCursorData(const StreamEntry& entry, Fields& fields, const CursorImageSchema& schema, Record& record);
+    void checkImage(Fields& fields, std::uint32_t size);
     void reportImage(std::uint64_t offset, std::uint32_t size, const EncodedImageCheck& check);
-    void checkText(std::uint64_t size);
+    void checkText(Fields& fields);
     void noteTime(std::uint64_t entryStart, double time);
     void noteCursor(std::uint64_t entryStart, std::uint64_t identifier, bool hasImage);
     void reportBeyondDuration();
 
-    UntrustedInput& input_;
+    StreamEntries entries_;
+    std::uint64_t fileSize_;
+    std::uint64_t size_;
     FindingLog& log_;
     StreamReport& report_;
-    std::uint64_t end_;
     std::optional<double> duration_;
     IsNextStream isNextStream_;
-    Outcome outcome_{};
+    std::uint64_t wholeEnd_ = 0; ///< in the stream: the end of the last whole entry
+    bool isTailLeftOut_ = false;
     std::string place_ = "stream";
     double latestTime_ = -std::numeric_limits<double>::infinity();
     std::uint64_t beyondDuration_ = 0; ///< entries

@@ -14,17 +14,18 @@ import { Player } from './stage/player';
 import { Stage } from './stage/stage';
 import { setUpAutomation } from './ui/automation';
 import { setUpControls, type Controls } from './ui/controls';
-import { ask, setUpDialogs, showHelp } from './ui/dialogs';
+import { ask, setUpDialogs } from './ui/dialogs';
 import { announce, byId, setText } from './ui/dom';
 import { setUpDrop } from './ui/drop';
 import { placeIcons } from './ui/icons';
 import { setUpKeys } from './ui/keys';
 import { mark, measured } from './ui/marks';
+import type { Page } from './ui/page';
 import { setUpSplitters } from './ui/splitter';
 import { setUpTabs, showTab } from './ui/tabs';
 import { setUpTheme } from './ui/theme';
 
-export class App {
+export class App implements Page {
   readonly player = new Player(byId<HTMLVideoElement>('movie'));
   readonly stage = new Stage(this.player);
   readonly decoder = new Decoder();
@@ -33,7 +34,6 @@ export class App {
   private movieName = '';
   private isFramePending = false;
   private opened = 0;
-  /// How many files were opened or refused.
   finished = 0;
   private controls!: Controls;
   private readonly timeline: Timeline;
@@ -234,10 +234,6 @@ export class App {
   findEntries(): void {
     showTab('tab-entries');
     this.entries.focusFilter();
-  }
-
-  help(): void {
-    showHelp();
   }
 
   private playerChanged(): void {

@@ -41,6 +41,15 @@ export class Recording {
     return this.all.find((entries) => entries.kind === kind)!;
   }
 
+  /// Every key is a caption here.
+  keyCaptions(showsKeys: boolean): Entries {
+    const { kind, time, columns } = this.entries('keyboardAction');
+    const label = (columns.characterString as string[]).map((name) => (showsKeys ? name : '•'));
+    const first = Int32Array.from(label, (_, i) => i);
+    const end = time.map((pressed) => pressed + 1.5);
+    return { kind, time, columns: { label, isTyped: first.map(() => 1), first, end } };
+  }
+
   info(): object {
     return { container: 'movie', bytes: 52428800, duration: 3600, streams: [], creators: [], warnings: [] };
   }

@@ -23,6 +23,7 @@ function session(...list: Entries[]): Session {
     duration: 20,
     streams: [],
     entries: list,
+    keys: undefined,
     hidden: [],
     info: {},
     verify: {},

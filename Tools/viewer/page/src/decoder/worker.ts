@@ -34,6 +34,9 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
     const read = known ? attempt(kind, () => opened.entries(kind)) : undefined;
     if (read) entries.push(read);
   }
+  const keys = entries.some(({ kind }) => kind === 'keyboardAction')
+    ? attempt('captions', () => ({ clear: opened.keyCaptions(true), masked: opened.keyCaptions(false) }))
+    : undefined;
   const hidden = opened.hidden.map((stream, index) => ({
     stream: { ...stream },
     entries: stream.known ? attempt(`hidden ${stream.kind}`, () => opened.hiddenEntries(index)) : undefined,
@@ -44,6 +47,7 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
     duration: opened.duration,
     streams: opened.streams.map((stream) => ({ ...stream })),
     entries,
+    keys,
     hidden,
     info: (reports && attempt('facts', () => opened.info())) || {},
     verify: (reports && attempt('check', () => opened.verify())) || {},
@@ -52,9 +56,10 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
 }
 
 /// What can be handed over instead of copied.
-function transferable({ entries, hidden }: Decoded): ArrayBuffer[] {
+function transferable({ entries, keys, hidden }: Decoded): ArrayBuffer[] {
   const buffers = new Set<ArrayBuffer>();
-  for (const { time, columns } of [...entries, ...hidden.flatMap(({ entries }) => entries ?? [])])
+  const all = [...entries, ...Object.values(keys ?? {}), ...hidden.flatMap(({ entries }) => entries ?? [])];
+  for (const { time, columns } of all)
     for (const column of [time, ...Object.values(columns)])
       if (ArrayBuffer.isView(column) && column.buffer instanceof ArrayBuffer) buffers.add(column.buffer);
   return [...buffers];

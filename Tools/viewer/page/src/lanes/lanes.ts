@@ -3,11 +3,10 @@
 import { clickLabel, type Click } from '../model/clicks';
 import { StreamRows } from '../entries/rows';
 import { brief, titleOf } from '../model/format';
-import { keyLabel } from '../model/keys';
+import { keyCap } from '../model/keys';
 import { countBefore, countUntil, lastAt } from '../model/search';
 import { rectAt, type HiddenStream, type Session } from '../model/session';
 import type { Track } from '../model/track';
-import { opacityAt } from '../stage/layers';
 import type { Palette } from '../ui/palette';
 import { Extremes } from './extremes';
 import { drawArea, drawBands, drawDensity, drawLine, type Curve, type Lane, type LaneCanvas } from './lane';
@@ -68,32 +67,53 @@ class NameColours {
   }
 }
 
-function textLane(session: Session, kind: string, column: string, title: string): Lane | undefined {
+interface BandName {
+  text: string;
+  index: number;
+  time: number;
+  palette: Palette;
+}
+
+/// A band for each entry.
+function bandLane(
+  session: Session,
+  kind: string,
+  title: string,
+  textOf: (track: Track, index: number) => string,
+  colourOf: (name: BandName) => string,
+): Lane | undefined {
   const track = filled(session, kind);
-  const colours = new NameColours();
   return (
     track && {
       title,
       height: 23,
       draw: (canvas) =>
         drawBands(canvas, track.times, (index) => {
-          const text = track.text(column, index);
-          const colour = colours.of(appAt(session, track.times[index]!) || text, canvas.palette);
-          return { start: track.times[index]!, end: track.endOf(index, session.duration), text, colour };
+          const [time, text] = [track.times[index]!, textOf(track, index)];
+          const colour = colourOf({ text, index, time, palette: canvas.palette });
+          return { start: time, end: track.endOf(index, session.duration), text, colour };
         }),
-      valueAt: (time) => textAt(track, column, time),
+      valueAt: (time) => {
+        const index = track.at(time);
+        return index >= 0 ? textOf(track, index) : '';
+      },
     }
+  );
+}
+
+const textsOf = (column: string) => (track: Track, index: number) => track.text(column, index);
+
+function textLane(session: Session, kind: string, column: string, title: string): Lane | undefined {
+  const colours = new NameColours();
+  return bandLane(session, kind, title, textsOf(column), ({ text, time, palette }) =>
+    colours.of(appAt(session, time) || text, palette),
   );
 }
 
 function appAt(session: Session, time: number): string {
   const track = session.track('topmostAppName');
-  return track ? textAt(track, 'name', time) : '';
-}
-
-function textAt(track: Track, column: string, time: number): string {
-  const index = track.at(time);
-  return index >= 0 ? track.text(column, index) : '';
+  const index = track?.at(time) ?? -1;
+  return index >= 0 ? track!.text('name', index) : '';
 }
 
 function slideLane(session: Session): Lane | undefined {
@@ -103,50 +123,19 @@ function slideLane(session: Session): Lane | undefined {
     ['slideComment', 'comment'],
   ];
   const [kind, column] = kinds.find(([kind]) => filled(session, kind)) ?? ['', ''];
-  const lane = textLane(session, kind, column, 'Slides');
-  const track = session.track(kind);
-  return (
-    lane &&
-    track && {
-      ...lane,
-      draw: (canvas) =>
-        drawBands(canvas, track.times, (index) => ({
-          start: track.times[index]!,
-          end: track.endOf(index, session.duration),
-          text: track.text(column, index),
-          colour: canvas.palette.bands[index % 2]!,
-        })),
-    }
-  );
+  return bandLane(session, kind, 'Slides', textsOf(column), ({ index, palette }) => palette.bands[index % 2]!);
 }
 
-function rectText(track: Track, time: number): string {
-  const index = track.at(time);
-  if (index < 0) return '';
+function rectText(track: Track, index: number): string {
   const { x, y, width, height } = rectAt(track, index);
   return `${width}×${height} at ${x}, ${y}`;
 }
 
 /// Shown on its own only where there are no names for its windows.
 function windowLane(session: Session): Lane | undefined {
-  const track = filled(session, 'topmostWindow');
-  if (!track || filled(session, 'topmostAppName') || filled(session, 'topmostWindowTitle')) return undefined;
+  if (filled(session, 'topmostAppName') || filled(session, 'topmostWindowTitle')) return undefined;
   const colours = new NameColours();
-  return {
-    title: 'Window',
-    height: 23,
-    draw: (canvas) =>
-      drawBands(canvas, track.times, (index) => {
-        const text = rectText(track, track.times[index]!);
-        return {
-          start: track.times[index]!,
-          end: track.endOf(index, session.duration),
-          text,
-          colour: colours.of(text, canvas.palette),
-        };
-      }),
-    valueAt: (time) => rectText(track, time),
-  };
+  return bandLane(session, 'topmostWindow', 'Window', rectText, ({ text, palette }) => colours.of(text, palette));
 }
 
 const roomForClicks = 6; // pixels to a click, from which on each is drawn
@@ -197,26 +186,27 @@ function drawClick(canvas: LaneCanvas, click: Click): void {
 const roomForKeys = 12; // pixels to a key, from which on each shows what it is
 
 function keyLane(session: Session, { showsKeys }: LaneOptions): Lane | undefined {
-  const track = filled(session, 'keyboardAction');
-  return (
-    track && {
-      title: 'Keys',
-      height: 23,
-      draw: (canvas) => {
-        const first = countBefore(track.times, canvas.range.from);
-        const end = countBefore(track.times, canvas.range.to);
-        if (end - first <= canvas.width / roomForKeys) drawKeys(canvas, track, first, end, showsKeys());
-        else drawDensity(canvas, track.times, canvas.palette.accent);
-      },
-      valueAt: (time) => {
-        const index = track.at(time);
-        return index >= 0 && time - track.times[index]! < 1 ? keyLabel(track, index, showsKeys()).text : '';
-      },
-    }
-  );
+  const keys = () => session.keys(showsKeys())!;
+  if (!session.keys(false)?.count) return undefined;
+  return {
+    title: 'Keys',
+    height: 23,
+    draw: (canvas) => {
+      const track = keys();
+      const first = countBefore(track.times, canvas.range.from);
+      const end = countBefore(track.times, canvas.range.to);
+      if (end - first <= canvas.width / roomForKeys) drawKeys(canvas, track, first, end);
+      else drawDensity(canvas, track.times, canvas.palette.accent);
+    },
+    valueAt: (time) => {
+      const track = keys();
+      const index = track.at(time);
+      return index >= 0 && time - track.times[index]! < 1 ? track.text('label', index) : '';
+    },
+  };
 }
 
-function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number, showsKeys: boolean): void {
+function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number): void {
   const {
     context,
     palette: { accent, accentSoft, text },
@@ -226,10 +216,7 @@ function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number, 
   for (let i = first; i < end; ++i) {
     const x = canvas.x(track.times[i]!);
     const room = (i + 1 < end ? canvas.x(track.times[i + 1]!) : Infinity) - x;
-    const label =
-      keyLabel(track, i, showsKeys)
-        .text.replace(/\[(.*)\]$/, '$1')
-        .trim() || '␣';
+    const label = keyCap(track.text('label', i)).trim() || '␣';
     const width = Math.max(9, context.measureText(label).width + 6);
     context.fillStyle = accent;
     context.fillRect(x - 0.75, canvas.top + 4, 1.5, canvas.height - 8);
@@ -364,8 +351,7 @@ function hoverLane(session: Session): Lane | undefined {
   const texts: string[] = [];
   let last = '';
   for (let i = 0; i < track.count; ++i) {
-    const { x, y, width, height } = rectAt(track, i);
-    const text = `${width}×${height} at ${x}, ${y}`;
+    const text = rectText(track, i);
     if (text === last) continue;
     starts.push(track.times[i]!);
     texts.push((last = text));
@@ -403,7 +389,7 @@ function opacityLane(session: Session): Lane | undefined {
     title: 'Opacity',
     height: 20,
     draw: (canvas) => drawArea(canvas, curve, canvas.palette.third, 0.16),
-    valueAt: (time) => `${Math.round(opacityAt(session, time) * 100)} %`,
+    valueAt: (time) => `${Math.round(session.opacityAt(time) * 100)} %`,
   };
 }
 

@@ -3,9 +3,8 @@
 import type { Entries, StreamSummary } from '#decoder';
 import { cursorAppearances, type Appearance } from './appearances';
 import { clicksOf, type Click } from './clicks';
-import { hasArea, type Rect } from './geometry';
+import { hasArea, type Point, type Rect } from './geometry';
 import { idleStretches, type Stretch } from './idle';
-import { captionsOf, type Caption } from './keys';
 import { markersOf } from './markers';
 import { speeds } from './speed';
 import { Track } from './track';
@@ -44,6 +43,8 @@ export interface Decoded {
   duration: number | undefined;
   streams: StreamSummary[];
   entries: Entries[];
+  /// The keys as captions show them.
+  keys: { clear: Entries; masked: Entries } | undefined;
   hidden: { stream: StreamSummary; entries: Entries | undefined }[];
   info: FileInfo;
   verify: FileCheck;
@@ -75,7 +76,8 @@ export class Session {
   /// Of the cursor, for each of its positions.
   readonly speeds: Float32Array;
   private readonly tracks = new Map<string, Track>();
-  private readonly captionLists = new Map<boolean, { captions: Caption[]; starts: Float64Array }>();
+  private readonly clearKeys: Track | undefined;
+  private readonly maskedKeys: Track | undefined;
 
   constructor(decoded: Decoded) {
     this.name = decoded.name;
@@ -84,6 +86,8 @@ export class Session {
     this.info = decoded.info;
     this.verify = decoded.verify;
     for (const entries of decoded.entries) this.tracks.set(entries.kind, new Track(entries));
+    this.clearKeys = decoded.keys && new Track(decoded.keys.clear);
+    this.maskedKeys = decoded.keys && new Track(decoded.keys.masked);
     this.hidden = decoded.hidden.map(({ stream, entries }) => ({
       stream,
       track: entries && new Track(entries),
@@ -109,14 +113,23 @@ export class Session {
     return [...this.tracks.values()];
   }
 
-  captions(showsKeys: boolean): { captions: Caption[]; starts: Float64Array } {
-    let list = this.captionLists.get(showsKeys);
-    if (!list) {
-      const captions = captionsOf(this.track('keyboardAction'), showsKeys);
-      list = { captions, starts: Float64Array.from(captions, ({ start }) => start) };
-      this.captionLists.set(showsKeys, list);
-    }
-    return list;
+  cursorAt(time: number): Point | undefined {
+    const track = this.track('cursorLocation');
+    const index = track?.at(time) ?? -1;
+    return track && index >= 0 ? { x: track.number('x', index), y: track.number('y', index) } : undefined;
+  }
+
+  /// The opacity of the cursor, from 0 to 1.
+  opacityAt(time: number): number {
+    const track = this.track('cursorOpacity');
+    const index = track?.at(time) ?? -1;
+    const opacity = index >= 0 ? track!.number('opacity', index) : 1;
+    return Number.isFinite(opacity) ? Math.max(0, Math.min(1, opacity)) : 1;
+  }
+
+  /// The keys as captions show them, or undefined if the recording has none.
+  keys(showsKeys: boolean): Track | undefined {
+    return showsKeys ? this.clearKeys : this.maskedKeys;
   }
 
   private recordedRegion(): Rect | undefined {

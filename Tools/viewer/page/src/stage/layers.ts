@@ -52,19 +52,6 @@ type Context = CanvasRenderingContext2D;
 
 const shade = 'rgb(0 0 0 / 55%)';
 
-export function cursorPosition(session: Session, time: number): Point | undefined {
-  const track = session.track('cursorLocation');
-  const index = track?.at(time) ?? -1;
-  return track && index >= 0 ? { x: track.number('x', index), y: track.number('y', index) } : undefined;
-}
-
-export function opacityAt(session: Session, time: number): number {
-  const track = session.track('cursorOpacity');
-  const index = track?.at(time) ?? -1;
-  const opacity = index >= 0 ? track!.number('opacity', index) : 1;
-  return Number.isFinite(opacity) ? Math.max(0, Math.min(1, opacity)) : 1;
-}
-
 export function drawHeat(context: Context, { placement }: Scene, picture: CanvasImageSource): void {
   context.imageSmoothingEnabled = true;
   context.drawImage(picture, 0, 0, heatWidth, heatHeight, 0, 0, placement.frame.width, placement.frame.height);
@@ -178,7 +165,7 @@ const rippleLength = 0.6; // seconds
 export function drawClicks(context: Context, scene: Scene): void {
   for (const click of clicksAround(scene.session.clicks, scene.clickStarts, scene.time, rippleLength)) {
     const isHeld = scene.time < click.end;
-    const position = cursorPosition(scene.session, isHeld ? scene.time : click.start);
+    const position = scene.session.cursorAt(isHeld ? scene.time : click.start);
     if (position) drawRipple(context, scene, click, screenToVideo(position, scene.placement), isHeld);
   }
 }
@@ -239,11 +226,11 @@ function chip(context: Context, { unit, font, placement }: Scene, text: string, 
 
 export function drawCursor(context: Context, scene: Scene): void {
   const { session, time, images, placement } = scene;
-  const position = cursorPosition(session, time);
+  const position = session.cursorAt(time);
   if (!position) return;
   const appearance = session.appearances[session.track('cursorImage')?.at(time) ?? -1];
   const image = appearance ? images.image(appearance) : null;
-  context.globalAlpha = opacityAt(session, time);
+  context.globalAlpha = session.opacityAt(time);
   if (image) {
     const rect = cursorImageRect(position, appearance!.hotSpot, image, placement);
     context.imageSmoothingQuality = 'high';

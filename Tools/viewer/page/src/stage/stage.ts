@@ -2,8 +2,7 @@
 
 import { fitted, placementOf, type Placement, type Size } from '../model/geometry';
 import { heatHeight, heatOf, heatWidth } from '../model/heat';
-import { captionAt, type Caption } from '../model/keys';
-import { lastAt } from '../model/search';
+import { captionAt, captionText, keyCap, type CaptionPart } from '../model/keys';
 import type { Session } from '../model/session';
 import { byId, fitCanvas, make } from '../ui/dom';
 import { palette } from '../ui/palette';
@@ -124,34 +123,26 @@ export class Stage {
   }
 
   /// What is typed at the moment, as far as the reader may see it.
-  captionAt(time: number): Caption | undefined {
-    if (!this.session || !layers.some(({ id, isOn }) => id === 'captions' && isOn)) return undefined;
-    const { captions, starts } = this.session.captions(this.showsKeys);
-    return captionAt(captions, lastAt(starts, time), time);
+  captionAt(time: number): CaptionPart[] {
+    const isOn = layers.some(({ id, isOn }) => id === 'captions' && isOn);
+    return isOn ? captionAt(this.session?.keys(this.showsKeys), time) : [];
   }
 
   private showCaption(time: number): void {
-    const caption = this.captionAt(time);
-    const text = caption?.text ?? '';
+    const parts = this.captionAt(time);
+    const text = captionText(parts);
     if (text === this.shownCaption) return;
     this.shownCaption = text;
     this.caption.style.fontSize = `${Math.max(12, Math.min(34, this.width * 0.024))}px`;
-    this.caption.hidden = !caption;
+    this.caption.hidden = parts.length === 0;
     this.caption.dataset.text = text;
-    this.caption.replaceChildren(...captionParts(caption));
+    this.caption.replaceChildren(...parts.map(captionPart));
   }
 }
 
 /// Running text as it is, other keys as caps.
-function captionParts(caption: Caption | undefined): Node[] {
-  const parts: HTMLElement[] = [];
-  for (const { label } of caption?.keys ?? []) {
-    const last = parts[parts.length - 1];
-    if (label.isTyped && last?.tagName === 'SPAN') last.textContent += label.text;
-    else if (label.isTyped) parts.push(make('span', {}, label.text));
-    else parts.push(make('kbd', {}, label.text.replace(/\[(.*)\]$/, '$1')));
-  }
-  return parts;
+function captionPart({ text, isTyped }: CaptionPart): Node {
+  return isTyped ? make('span', {}, text) : make('kbd', {}, keyCap(text));
 }
 
 const heatStops: [number, number, number, number][] = [

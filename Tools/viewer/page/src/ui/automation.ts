@@ -1,8 +1,8 @@
 // For scripts that drive the page: where it is, what it shows, and what was decoded.
 
-import type { App } from '../app';
 import { screenToVideo } from '../model/geometry';
-import { cursorPosition, opacityAt } from '../stage/layers';
+import { captionText } from '../model/keys';
+import type { Page } from './page';
 
 export interface ViewerState {
   isOpen: boolean;
@@ -27,8 +27,8 @@ declare global {
   };
 }
 
-function stateOf({ session, player, stage, finished }: App): ViewerState {
-  const position = session && cursorPosition(session, player.time);
+function stateOf({ session, player, stage, finished }: Page): ViewerState {
+  const position = session?.cursorAt(player.time);
   return {
     isOpen: session !== undefined,
     finished,
@@ -38,15 +38,15 @@ function stateOf({ session, player, stage, finished }: App): ViewerState {
     movie: player.movie,
     frame: stage.placement.frame,
     hotSpot: position ? screenToVideo(position, stage.placement) : null,
-    opacity: session ? opacityAt(session, player.time) : 1,
-    caption: stage.captionAt(player.time)?.text ?? '',
+    opacity: session?.opacityAt(player.time) ?? 1,
+    caption: captionText(stage.captionAt(player.time)),
   };
 }
 
-export function setUpAutomation(app: App): void {
+export function setUpAutomation(page: Page): void {
   globalThis.zulmViewer = {
-    seek: (time) => app.seek(time),
-    state: () => stateOf(app),
-    dump: () => app.decoder.dump(),
+    seek: (time) => page.seek(time),
+    state: () => stateOf(page),
+    dump: () => page.decoder.dump(),
   };
 }

@@ -1,10 +1,10 @@
 // The buttons below the movie.
 
-import type { App } from '../app';
 import { clock } from '../model/format';
 import { layers } from '../stage/layers';
 import { byId, make, setText } from './dom';
 import { setIcon } from './icons';
+import type { Page } from './page';
 
 export interface Controls {
   showState(): void;
@@ -13,20 +13,20 @@ export interface Controls {
 
 const rates = [0.25, 0.5, 1, 1.5, 2, 4];
 
-export function setUpControls(app: App): Controls {
+export function setUpControls(page: Page): Controls {
   const on = (id: string, action: () => void) => byId(id).addEventListener('click', action);
-  on('play', () => app.player.toggle());
-  on('frame-back', () => app.stepFrame(-1));
-  on('frame-forward', () => app.stepFrame(1));
-  on('marker-back', () => app.stepMarker(-1));
-  on('marker-forward', () => app.stepMarker(1));
-  on('rate', () => (app.player.rate = rates[(rates.indexOf(app.player.rate) + 1) % rates.length]!));
-  on('sound', () => (app.player.muted = !app.player.muted));
-  on('keys-button', () => app.switchKeys());
+  on('play', () => page.player.toggle());
+  on('frame-back', () => page.stepFrame(-1));
+  on('frame-forward', () => page.stepFrame(1));
+  on('marker-back', () => page.stepMarker(-1));
+  on('marker-forward', () => page.stepMarker(1));
+  on('rate', () => (page.player.rate = rates[(rates.indexOf(page.player.rate) + 1) % rates.length]!));
+  on('sound', () => (page.player.muted = !page.player.muted));
+  on('keys-button', () => page.switchKeys());
   on('full-screen', () => void switchFullScreen());
-  byId('frame').addEventListener('click', () => app.player.toggle());
-  const boxes = setUpLayers(app);
-  return { showState: () => showState(app, boxes), showTime };
+  byId('frame').addEventListener('click', () => page.player.toggle());
+  const boxes = setUpLayers(page);
+  return { showState: () => showState(page, boxes), showTime };
 }
 
 export async function switchFullScreen(): Promise<void> {
@@ -38,12 +38,12 @@ export async function switchFullScreen(): Promise<void> {
   }
 }
 
-function setUpLayers(app: App): HTMLInputElement[] {
+function setUpLayers(page: Page): HTMLInputElement[] {
   const button = byId('layers-button');
   const menu = byId('layers-menu');
   const boxes = layers.map(({ id, name, key }) => {
     const box = make('input', { type: 'checkbox', class: 'switch', role: 'switch' });
-    box.addEventListener('change', () => app.switchLayer(id));
+    box.addEventListener('change', () => page.switchLayer(id));
     menu.append(make('label', { class: 'menu-item' }, make('span', {}, name), make('kbd', {}, key), box));
     return box;
   });
@@ -64,7 +64,7 @@ function setUpLayers(app: App): HTMLInputElement[] {
   return boxes;
 }
 
-function showState({ player, stage }: App, boxes: HTMLInputElement[]): void {
+function showState({ player, stage }: Page, boxes: HTMLInputElement[]): void {
   setIcon(byId('play'), player.playing ? 'pause' : 'play');
   byId('play').setAttribute('aria-label', player.playing ? 'Pause' : 'Play');
   setText(byId('rate'), `${player.rate}×`);

@@ -1,37 +1,38 @@
 // What keys do, wherever nobody is writing.
 
-import type { App } from '../app';
 import { layers } from '../stage/layers';
 import { switchFullScreen } from './controls';
+import { showHelp } from './dialogs';
+import type { Page } from './page';
 
-export function setUpKeys(app: App): void {
+export function setUpKeys(page: Page): void {
   const actions: Record<string, (event: KeyboardEvent) => void> = {
-    ' ': () => app.player.toggle(),
-    ArrowLeft: ({ shiftKey }) => app.step(shiftKey ? -10 : -1),
-    ArrowRight: ({ shiftKey }) => app.step(shiftKey ? 10 : 1),
-    ',': () => app.stepFrame(-1),
-    '.': () => app.stepFrame(1),
-    '[': () => app.stepMarker(-1),
-    ']': () => app.stepMarker(1),
-    Home: () => app.seek(0),
-    End: () => app.seek(app.player.duration),
-    '+': () => app.zoom(0.5),
-    '=': () => app.zoom(0.5),
-    '-': () => app.zoom(2),
-    '0': () => app.zoom(0),
-    '/': () => app.findEntries(),
-    n: () => app.stepMatch(1),
-    N: () => app.stepMatch(-1),
-    k: () => app.switchKeys(),
-    m: () => void (app.player.muted = !app.player.muted),
+    ' ': () => page.player.toggle(),
+    ArrowLeft: ({ shiftKey }) => page.step(shiftKey ? -10 : -1),
+    ArrowRight: ({ shiftKey }) => page.step(shiftKey ? 10 : 1),
+    ',': () => page.stepFrame(-1),
+    '.': () => page.stepFrame(1),
+    '[': () => page.stepMarker(-1),
+    ']': () => page.stepMarker(1),
+    Home: () => page.seek(0),
+    End: () => page.seek(page.player.duration),
+    '+': () => page.zoom(0.5),
+    '=': () => page.zoom(0.5),
+    '-': () => page.zoom(2),
+    '0': () => page.zoom(0),
+    '/': () => page.findEntries(),
+    n: () => page.stepMatch(1),
+    N: () => page.stepMatch(-1),
+    k: () => page.switchKeys(),
+    m: () => void (page.player.muted = !page.player.muted),
     f: () => void switchFullScreen(),
-    '?': () => app.help(),
+    '?': showHelp,
   };
-  for (const { id, key } of layers) actions[key] = () => app.switchLayer(id);
+  for (const { id, key } of layers) actions[key] = () => page.switchLayer(id);
   document.addEventListener('keydown', (event) => {
     const isTaken = event.ctrlKey || event.metaKey || event.altKey || event.defaultPrevented;
     const action = actions[event.key];
-    if (!action || isTaken || usesKey(event) || (!app.session && event.key !== '?')) return;
+    if (!action || isTaken || usesKey(event) || (!page.session && event.key !== '?')) return;
     event.preventDefault();
     action(event);
   });

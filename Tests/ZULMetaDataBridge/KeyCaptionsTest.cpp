@@ -1,0 +1,150 @@
+#include "ZULMetaDataBridge/Source/KeyCaptions.h"
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <cstdint>
+#include <limits>
+#include <string>
+#include <vector>
+
+namespace ZULMetaData::Test {
+namespace {
+
+using testing::ElementsAre;
+using testing::IsEmpty;
+
+constexpr std::uint32_t s_lock = 0x10000;
+constexpr std::uint32_t s_shift = 0x20000;
+constexpr std::uint32_t s_control = 0x40000;
+constexpr std::uint32_t s_alt = 0x80000;
+constexpr std::uint32_t s_command = 0x100000;
+constexpr std::uint32_t s_virtualKey = 0x40000000;
+constexpr std::uint32_t s_windows = 0x80000000;
+constexpr std::uint32_t s_return = 13;
+constexpr std::uint32_t s_up = 38;
+
+const std::string s_bullet = "\xe2\x80\xa2";
+
+std::string label(std::uint32_t code, std::uint32_t flags = 0) {
+    return keyCaptions({{1, {code, flags}}}, true).at(0).text;
+}
+
+std::string maskedLabel(std::uint32_t code, std::uint32_t flags = 0) {
+    return keyCaptions({{1, {code, flags}}}, false).at(0).text;
+}
+
+std::vector<KeyEvent> typed(double time, const std::string& text) {
+    std::vector<KeyEvent> keys;
+    for (const char c : text)
+        keys.push_back({time, {static_cast<unsigned char>(c), 0}});
+    return keys;
+}
+
+std::vector<std::string> textsOf(const std::vector<KeyCaption>& captions) {
+    std::vector<std::string> texts;
+    for (const KeyCaption& caption : captions)
+        texts.push_back(caption.text);
+    return texts;
+}
+
+TEST(KeyCaptions, ShowCharactersAsTheyAre) {
+    EXPECT_EQ(label('A'), "A");
+    EXPECT_EQ(label(' '), " ");
+    EXPECT_EQ(label('5'), "5");
+    EXPECT_EQ(label(0x20ac), "\xe2\x82\xac");
+    EXPECT_EQ(label(0xd800), "[key 55296]");
+    EXPECT_EQ(label(1), "[key 1]");
+}
+
+TEST(KeyCaptions, ShowWhatVirtualKeysType) {
+    EXPECT_EQ(label('A', s_virtualKey), "a");
+    EXPECT_EQ(label('A', s_virtualKey | s_shift), "A");
+    EXPECT_EQ(label('A', s_virtualKey | s_lock), "A");
+    EXPECT_EQ(label('A', s_virtualKey | s_lock | s_shift), "a");
+    EXPECT_EQ(label(' ', s_virtualKey), " ");
+    EXPECT_EQ(label('1', s_virtualKey), "1");
+    EXPECT_EQ(label('5', s_virtualKey | s_shift), "%");
+    EXPECT_EQ(label(188, s_virtualKey), ",");
+    EXPECT_EQ(label(190, s_virtualKey), ".");
+}
+
+TEST(KeyCaptions, NameKeysThatTypeNothing) {
+    EXPECT_EQ(label(s_return), "[returnKey]");
+    EXPECT_EQ(label(115, s_virtualKey), "[f4]");
+    EXPECT_EQ(label(39, s_virtualKey), "[right]");
+    EXPECT_EQ(label(97, s_virtualKey), "[key 97]");
+}
+
+TEST(KeyCaptions, ShowModifiersAsSignsBeforeTheKey) {
+    EXPECT_EQ(label('S', s_virtualKey | s_shift | s_command), "\xe2\x87\xa7\xe2\x8c\x98S");
+    EXPECT_EQ(label(s_up, s_virtualKey | s_control | s_alt | s_windows), "\xe2\x8c\x83\xe2\x8c\xa5\xe2\x8a\x9e[up]");
+    EXPECT_EQ(label(9, s_shift), "\xe2\x87\xa7[tab]");
+}
+
+TEST(KeyCaptions, MaskWhatWasTypedAndNoOtherKeys) {
+    EXPECT_EQ(maskedLabel('A', s_virtualKey), s_bullet);
+    EXPECT_EQ(maskedLabel('\''), s_bullet);
+    EXPECT_EQ(maskedLabel('A', s_virtualKey | s_command), "\xe2\x8c\x98" + s_bullet);
+    EXPECT_EQ(maskedLabel(97, s_virtualKey), s_bullet) << "it may type a character";
+    EXPECT_EQ(maskedLabel(s_return), "[returnKey]");
+    EXPECT_EQ(maskedLabel(s_up, s_virtualKey), "[up]");
+}
+
+TEST(KeyCaptions, MaskEveryKeyThatTypesACharacter) {
+    for (std::uint32_t code = 0; code < 0x180; ++code) {
+        const bool isNamed = (code >= 3 && code <= 47 && code != 32) || (code >= 112 && code <= 145) || code == 0;
+        for (const std::uint32_t flags : {0U, s_virtualKey, s_shift, s_command}) {
+            const bool isSpecial = isNamed && (flags == s_virtualKey || code < 32 || code == 127);
+            const std::string shown = maskedLabel(code, flags);
+            EXPECT_TRUE(isSpecial || shown == s_bullet || shown == "\xe2\x8c\x98" + s_bullet) << shown;
+        }
+    }
+}
+
+TEST(KeyCaptions, EndAtAPauseOrTheReturnKey) {
+    const std::vector<KeyEvent> keys{
+        {1, {'H', 0}}, {1.25, {'I', 0}}, {1.5, {s_return, 0}}, {1.75, {'O', 0}}, {3, {'K', 0}}};
+    const std::vector<KeyCaption> captions = keyCaptions(keys, true);
+    EXPECT_THAT(textsOf(captions), ElementsAre("HI [returnKey]", "O", "K"));
+    EXPECT_EQ(captions[0].start, 1);
+    EXPECT_EQ(captions[0].end, 3);
+    EXPECT_EQ(captions[1].start, 1.75);
+    EXPECT_EQ(captions[1].end, 3.25);
+    EXPECT_THAT(textsOf(keyCaptions(keys, true, 0.25)), ElementsAre("H", "I", "[returnKey]", "O", "K"));
+    EXPECT_THAT(textsOf(keyCaptions(keys, true, 5)), ElementsAre("HI [returnKey]", "OK"));
+}
+
+TEST(KeyCaptions, AreNoLongerThanALine) {
+    EXPECT_THAT(textsOf(keyCaptions(typed(1, std::string(50, 'x')), true)),
+                ElementsAre(std::string(42, 'x'), std::string(8, 'x')));
+    const std::vector<KeyCaption> masked = keyCaptions(typed(1, std::string(50, 'x')), false);
+    EXPECT_EQ(masked.at(0).text.size(), 42 * s_bullet.size()) << "a line is counted in characters";
+}
+
+TEST(KeyCaptions, HoldTheirKeysInTheOrderOfTheirTimes) {
+    const double nan = std::numeric_limits<double>::quiet_NaN();
+    const double infinity = std::numeric_limits<double>::infinity();
+    const std::vector<KeyCaption> captions = keyCaptions(
+        {{2, {'S', s_command}}, {nan, {'x', 0}}, {1.5, {'b', 0}}, {1, {'a', 0}}, {1.5, {'c', 0}}, {infinity, {'y', 0}}},
+        true);
+    ASSERT_THAT(textsOf(captions), ElementsAre("abc \xe2\x8c\x98S"));
+    std::vector<std::string> labels;
+    std::vector<double> times;
+    std::vector<bool> areTyped;
+    for (const CaptionKey& key : captions[0].keys) {
+        labels.push_back(key.label);
+        times.push_back(key.time);
+        areTyped.push_back(key.isTyped);
+    }
+    EXPECT_THAT(labels, ElementsAre("a", "b", "c", "\xe2\x8c\x98S"));
+    EXPECT_THAT(times, ElementsAre(1, 1.5, 1.5, 2));
+    EXPECT_THAT(areTyped, ElementsAre(true, true, true, false));
+}
+
+TEST(KeyCaptions, AreNoneIfNoKeyWasPressed) {
+    EXPECT_THAT(keyCaptions({}, true), IsEmpty());
+}
+
+} // namespace
+} // namespace ZULMetaData::Test

@@ -1,0 +1,34 @@
+#include "ZULMetaData/ByteReader.h"
+
+#include <algorithm>
+
+namespace ZULMetaData::detail {
+
+namespace {
+
+/// Headers may lie far apart, and entries follow one another: the window is small after a jump and grows as long as the
+/// reads follow one another. In a sparse movie of 200,000 atoms, windows of 64 KiB take seven times as long.
+constexpr std::size_t s_smallestBlock = 2048;
+constexpr std::size_t s_largestBlock = 65536;
+
+} // namespace
+
+std::string_view ByteReader::refilled(std::uint64_t position, std::uint64_t size) {
+    const std::uint64_t left = source_.size() - std::min(position, source_.size());
+    const std::uint64_t wanted = std::min(size, left);
+    const std::uint64_t windowEnd = windowStart_ + window_.size();
+    const bool isNext = position >= windowStart_ && position <= windowEnd && !window_.empty();
+    if (position < windowStart_ || position > windowEnd || wanted > windowEnd - position) {
+        blockSize_ = isNext ? std::min(2 * blockSize_, s_largestBlock) : s_smallestBlock;
+        const auto count = static_cast<std::size_t>(std::min(std::max<std::uint64_t>(wanted, blockSize_), left));
+        if (window_.capacity() > 2 * s_largestBlock && count <= s_largestBlock)
+            window_ = {}; // a single large piece does not keep its memory
+        window_.resize(count);
+        windowStart_ = position;
+        window_.resize(source_.read(position, window_));
+    }
+    const auto start = static_cast<std::size_t>(position - windowStart_);
+    return {window_.data() + start, std::min(static_cast<std::size_t>(wanted), window_.size() - start)};
+}
+
+} // namespace ZULMetaData::detail

@@ -1,0 +1,35 @@
+#pragma once
+
+#include "../SharedDependencies/Export.h"
+#include "ByteSource.h"
+
+#include <cstddef>
+#include <cstdint>
+#include <istream>
+#include <streambuf>
+#include <vector>
+
+namespace ZULMetaData {
+
+/// An input stream over a source, for readers that take a stream. Reads small blocks after a seek and larger ones as
+/// the reads follow one another. A source that cannot be read makes the stream bad.
+class ZULMETADATA_API ByteSourceStream final : private std::streambuf, public std::istream {
+public:
+    explicit ByteSourceStream(ByteSource source);
+
+protected:
+    std::streambuf::int_type underflow() override;
+    std::streambuf::pos_type seekoff(std::streambuf::off_type offset, std::ios_base::seekdir from,
+                                     std::ios_base::openmode which) override;
+    std::streambuf::pos_type seekpos(std::streambuf::pos_type position, std::ios_base::openmode which) override;
+
+private:
+    std::uint64_t position() const { return blockEnd_ - static_cast<std::uint64_t>(egptr() - gptr()); }
+
+    ByteSource source_;
+    std::vector<char> block_;
+    std::size_t blockSize_ = 0;
+    std::uint64_t blockEnd_ = 0; ///< the position in the source after the bytes of the block
+};
+
+} // namespace ZULMetaData
