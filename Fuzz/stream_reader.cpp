@@ -23,12 +23,7 @@ struct Observer final : DataStreamObserver<Value> {
 
 /// The walk that believes nothing must get through whatever the reader gets through.
 void walkCarefully(std::string_view bytes) {
-    const auto read = [bytes](std::uint64_t position, std::span<char> into) {
-        const std::string_view piece = bytes.substr(position, into.size());
-        std::memcpy(into.data(), piece.data(), piece.size());
-        return piece.size();
-    };
-    StreamEntries entries(read, bytes.size());
+    StreamEntries entries(ByteSource::memory(bytes));
     std::uint64_t end = s_metaDataHeaderSize;
     while (const auto entry = entries.next()) {
         if (entry->offset != end || entry->end() > bytes.size())

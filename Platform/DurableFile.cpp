@@ -49,7 +49,7 @@ int syncOnce(int descriptor) {
 
 } // namespace
 
-// Without O_NONBLOCK, opening a pipe would wait for its other end.
+/// Without O_NONBLOCK, opening a pipe would wait for its other end.
 DurableFile::DurableFile(const FileLocation& file)
     : descriptor_(uninterrupted([&] { return open(file.c_str(), O_RDWR | O_CLOEXEC | O_NONBLOCK | O_NOCTTY); })) {
     if (descriptor_ < 0)
@@ -69,6 +69,12 @@ DurableFile::~DurableFile() {
 
 std::uint64_t DurableFile::size() const {
     return static_cast<std::uint64_t>(statusOf(descriptor_).st_size);
+}
+
+bool DurableFile::isNamed(const FileLocation& file) const {
+    struct stat named {};
+    const struct stat own = statusOf(descriptor_);
+    return stat(file.c_str(), &named) == 0 && named.st_dev == own.st_dev && named.st_ino == own.st_ino;
 }
 
 std::size_t DurableFile::readAt(std::uint64_t position, std::span<char> bytes) const {

@@ -23,7 +23,10 @@ public:
 
     std::uint64_t size() const;
 
-    /// Gives how many bytes were read: fewer than asked for only where the file ends.
+    /// Returns whether this is still the file of that name. Another program may have removed or replaced it.
+    bool isNamed(const FileLocation& file) const;
+
+    /// Reads bytes and returns their number, which is smaller than asked for only at the end of the file.
     std::size_t readAt(std::uint64_t position, std::span<char> bytes) const;
 
     /// Writes all of `bytes`, or throws with some of them written.

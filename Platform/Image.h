@@ -1,14 +1,21 @@
 #pragma once
 
 // A picture in memory and the bitmap made from its TIFF data: with them a cursor image becomes PNG bytes and comes
-// back. Everything happens in memory. What a codec cannot read or write is "no image", without a message; only
-// std::bad_alloc, where memory ends, leaves these functions as an exception.
+// back. Everything happens in memory. What a codec cannot read or write is "no image", without a message.
+//
+// The only exception is `std::bad_alloc`, if memory ends. libtiff reports this like damage, so a TIFF file that is read
+// while memory ends may also count as no image.
+//
+// A build without codecs (`ZULMETADATA_IMAGE_CODECS`) knows an image by its size. It encodes nothing and examines no
+// more of a file than its headers: an image has no pixels, and every file that states a size passes for decodable, with
+// four bytes for each pixel and without surplus.
 
 #include "../SharedDependencies/Export.h"
 
 #include <cstdint>
 #include <optional>
 #include <span>
+#include <utility>
 #include <vector>
 
 namespace ZULMetaData {
@@ -26,14 +33,14 @@ struct EncodedImageCheck {
     enum State : std::uint8_t {
         Undecodable, ///< it does not
         Decodable,   ///< it does
-        NotUnpacked, ///< nothing but the pixels was examined, because they take too much time or memory
+        NotUnpacked, ///< it may: its pixels were not unpacked, because they take too much time or memory
     };
 
     State state = Undecodable;       ///< the result of the check
     std::uint32_t width = 0;         ///< in pixels; 0 if the headers are damaged
     std::uint32_t height = 0;        ///< in pixels; 0 if the headers are damaged
     std::uint64_t unpackedBytes = 0; ///< of all pixels, before the file compressed them; 0 if the headers are damaged
-    std::uint64_t surplusBytes = 0;  ///< of a PNG file: after the end chunk, and in bulk after the last pixel
+    std::uint64_t surplusBytes = 0;  ///< of a PNG file: after the end chunk, or in bulk after the last pixel
 };
 
 /// Pixels of red, green, blue and straight alpha.
@@ -42,13 +49,14 @@ public:
     /// `rgba` holds width * height pixels of four bytes (red, green, blue, straight alpha), rows from the top without
     /// padding. Any other amount is kept as it is; such an image cannot be encoded, and neither can one with a side
     /// of 0 or of more than 16384 pixels.
-    Image(std::uint32_t width, std::uint32_t height, std::vector<std::uint8_t> rgba);
+    Image(std::uint32_t width, std::uint32_t height, std::vector<std::uint8_t> rgba)
+        : width_(width), height_(height), rgba_(std::move(rgba)) {}
 
     /// Decodes a whole PNG or TIFF file of at most 16384 pixels a side. A file that is damaged, cut short, or claims
-    /// more pixels than its bytes can hold gives no image.
+    /// more pixels than its bytes can hold, is no image.
     static std::optional<Image> fromEncodedBytes(std::span<const std::uint8_t> encoded);
 
-    /// Reads the headers alone. Nothing where they already rule out that the file decodes.
+    /// Reads the headers alone. Returns nothing if they already rule out that the file can be decoded.
     static std::optional<EncodedImageInfo> infoOfEncodedBytes(std::span<const std::uint8_t> encoded);
 
     /// Reads the whole file and makes no image of it. Whatever the file claims, this takes less than 0.2 seconds, and
@@ -63,8 +71,8 @@ public:
     /// Valid as long as the image.
     std::span<const std::uint8_t> rgba() const noexcept { return rgba_; }
 
-    /// Uncompressed and lossless, also for the colours of pixels that are fully transparent. Empty where the image
-    /// cannot be encoded.
+    /// Uncompressed and lossless, also for the colours of pixels that are fully transparent. Empty if the image cannot
+    /// be encoded.
     std::vector<std::uint8_t> tiffRepresentation() const;
 
 private:
@@ -83,7 +91,7 @@ public:
     std::vector<std::uint8_t> pngRepresentation() const;
 
 private:
-    explicit BitmapImageRep(Image image);
+    explicit BitmapImageRep(Image image) : image_(std::move(image)) {}
 
     Image image_;
 };

@@ -4,8 +4,11 @@
 
 #include "Platform/Image.h"
 
+#include <algorithm>
+#include <array>
 #include <cstddef>
 #include <cstdint>
+#include <span>
 
 namespace ZULMetaData {
 
@@ -19,19 +22,18 @@ inline constexpr std::uint64_t s_maximumDeflateRatio = 1040;
 /// a megabyte of them; so many take a tenth of a second.
 inline constexpr std::uint64_t s_mostUnpackedToCheck = std::uint64_t{32} << 20;
 
+/// Returns whether the bytes begin like a PNG file. All others are taken for a TIFF file.
+inline bool isPNG(std::span<const std::uint8_t> encoded) {
+    constexpr std::array<std::uint8_t, 8> signature{0x89, 'P', 'N', 'G', '\r', '\n', 0x1a, '\n'};
+    return encoded.size() >= signature.size() && std::equal(signature.begin(), signature.end(), encoded.begin());
+}
+
 constexpr bool isImageSizeAllowed(std::uint32_t width, std::uint32_t height) noexcept {
     return width > 0 && height > 0 && width <= s_maximumImageSide && height <= s_maximumImageSide;
 }
 
 constexpr std::size_t rgbaSize(std::uint32_t width, std::uint32_t height) noexcept {
     return std::size_t{4} * width * height;
-}
-
-/// What decoding a PNG file of this size may hold at a time.
-constexpr std::uint64_t memoryToDecodePNG(std::uint32_t width, std::uint32_t height) noexcept {
-    constexpr std::uint64_t rowBuffers = 8; // a few rows of up to 16 bits a channel
-    constexpr std::uint64_t tables = std::uint64_t{128} << 10;
-    return rgbaSize(width, height) + rowBuffers * rgbaSize(width, 1) + tables;
 }
 
 inline bool isEncodable(const Image& image) noexcept {

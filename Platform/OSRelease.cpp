@@ -16,9 +16,8 @@ bool startsWithDigit(std::string_view text) {
 
 std::string_view trimmed(std::string_view text) {
     const auto first = text.find_first_not_of(s_blanks);
-    if (first == std::string_view::npos) {
+    if (first == std::string_view::npos)
         return {};
-    }
     return text.substr(first, text.find_last_not_of(s_blanks) - first + 1);
 }
 
@@ -32,21 +31,20 @@ bool isEscapable(char next, char quote) {
     return quote == '\0' || next == '"' || next == '\\' || next == '$' || next == '`';
 }
 
-// A word of the shell: single quotes keep everything, double quotes and bare text know the backslash.
+/// A word of the shell: single quotes keep everything, double quotes and bare text know the backslash.
 std::optional<std::string> unquoted(std::string_view word) {
     std::string value;
     char quote = '\0';
     for (std::size_t i = 0; i < word.size(); ++i) {
         const char c = word[i];
-        if (c == '\\' && quote != '\'' && i + 1 < word.size() && isEscapable(word[i + 1], quote)) {
+        if (c == '\\' && quote != '\'' && i + 1 < word.size() && isEscapable(word[i + 1], quote))
             value += word[++i];
-        } else if (quote == '\0' && (c == '"' || c == '\'')) {
+        else if (quote == '\0' && (c == '"' || c == '\''))
             quote = c;
-        } else if (quote != '\0' && c == quote) {
+        else if (quote != '\0' && c == quote)
             quote = '\0';
-        } else {
+        else
             value += c;
-        }
     }
     return quote == '\0' ? std::optional(value) : std::nullopt;
 }
@@ -56,17 +54,14 @@ std::optional<std::string> unquoted(std::string_view word) {
 ReleaseNumbers parseReleaseNumbers(std::string_view release) noexcept {
     ReleaseNumbers numbers;
     for (std::int64_t* part : {&numbers.major, &numbers.minor, &numbers.patch}) {
-        if (!startsWithDigit(release)) {
+        if (!startsWithDigit(release))
             break;
-        }
         const auto [end, error] = std::from_chars(release.data(), release.data() + release.size(), *part);
-        if (error != std::errc{}) {
+        if (error != std::errc{})
             break;
-        }
         release.remove_prefix(static_cast<std::size_t>(end - release.data()));
-        if (release.empty() || release.front() != '.') {
+        if (release.empty() || release.front() != '.')
             break;
-        }
         release.remove_prefix(1);
     }
     return numbers;
@@ -77,9 +72,8 @@ std::string prettyNameOfOSRelease(std::string_view text) {
     std::string name;
     while (!text.empty()) {
         const auto line = trimmed(takeLine(text));
-        if (line.starts_with(key)) {
+        if (line.starts_with(key))
             name = unquoted(line.substr(key.size())).value_or(std::string());
-        }
     }
     return name;
 }

@@ -76,9 +76,8 @@ std::uint64_t memorySize() {
 
 utsname kernelName() {
     utsname name{};
-    if (uname(&name) != 0) {
+    if (uname(&name) != 0)
         return {};
-    }
     return name;
 }
 
@@ -94,11 +93,9 @@ std::string contentsOf(const char* path) {
 }
 
 std::string versionText() {
-    for (const char* path : {"/etc/os-release", "/usr/lib/os-release"}) {
-        if (auto name = prettyNameOfOSRelease(contentsOf(path)); !name.empty()) {
+    for (const char* path : {"/etc/os-release", "/usr/lib/os-release"})
+        if (auto name = prettyNameOfOSRelease(contentsOf(path)); !name.empty())
             return name;
-        }
-    }
     const utsname kernel = kernelName();
     return std::string(kernel.sysname) + " " + kernel.release;
 }

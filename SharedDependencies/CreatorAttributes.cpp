@@ -1,5 +1,7 @@
 #include "SharedDependencies/CreatorAttributes.h"
 
+#include "SharedDependencies/UTF8.h"
+
 #include <algorithm>
 #include <cstring>
 #include <iterator>
@@ -9,14 +11,10 @@ namespace ZULMetaData {
 
 namespace {
 
-bool isContinuationByte(char c) {
-    return (static_cast<unsigned char>(c) & 0xc0) == 0x80;
-}
-
 std::size_t lengthCutAtCharacter(std::string_view text, std::size_t limit) {
     if (text.size() <= limit)
         return text.size();
-    while (limit > 0 && isContinuationByte(text[limit]))
+    while (limit > 0 && continuesCharacter(text[limit]))
         --limit;
     return limit;
 }

@@ -98,10 +98,10 @@ void forEachField(Record& record, int version, Visit visit) {
         if (steps[i].existsIn(version) && steps[i].condition(record))
             visit(steps[i].fieldGetter(record));
     };
-    [&]<std::size_t... i>(std::index_sequence<i...>) {
+    const auto visitAll = [&]<std::size_t... i>(std::index_sequence<i...>) {
         (visitStep.template operator()<i>(), ...);
-    }
-    (std::make_index_sequence<steps.size()>());
+    };
+    visitAll(std::make_index_sequence<steps.size()>());
 }
 
 } // namespace ZULMetaData::detail

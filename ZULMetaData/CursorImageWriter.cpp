@@ -91,6 +91,7 @@ bool CursorImageReader::readImage(std::istream& stream, const CursorImageSchema&
 
 bool CursorImageReader::readField(std::istream& stream, const FieldInfo& field) {
     const bool outOfMemory = !field.data && field.size != 0;
+    hasRunOutOfMemory_ = hasRunOutOfMemory_ || outOfMemory;
     if (detail::inputEnded(stream) || bytesLeft_ < field.size || outOfMemory)
         return false;
     Read(stream, field);

@@ -51,13 +51,13 @@ public:
     /// Reads both parts of an entry.
     void ReadCursorImageMetaData(std::istream& stream, const CursorImageSchema& schema, Record& record);
 
-    /// Reads the first part. Throws `std::runtime_error` "invalid meta data entry" if the input ends before one of the
-    /// fields.
+    /// Reads the first part. Throws `InvalidEntry` if the input ends before one of the fields.
     void ReadBaseInfo(std::istream& stream, const CursorImageSchema& schema, Record& record);
 
     /// Reads the data part and replaces the image. Stops without an error at the first field that does not fit into the
-    /// data part or is beyond the end of the input, and skips the rest of the data part. If the image does not fit, the
-    /// record has neither data nor size afterwards. If the input ends inside the image, the missing bytes are zeros.
+    /// data part or is beyond the end of the input, and skips the rest of the data part. If the image does not fit, or
+    /// if there is no memory for it, the record has neither data nor size afterwards. If the input ends inside the
+    /// image, the missing bytes are zeros.
     void ReadMetaDataFields(std::istream& stream, const CursorImageSchema& schema, Record& record);
 
     void IgnoreLeftoverBytes(std::istream& stream,
@@ -66,12 +66,16 @@ public:
     /// Returns the number of bytes of the data part that have not been read.
     std::uint32_t bytesLeft() const { return bytesLeft_; }
 
+    /// Returns whether an image was left out because there was no memory for it.
+    bool hasRunOutOfMemory() const { return hasRunOutOfMemory_; }
+
 private:
     bool readImage(std::istream& stream, const CursorImageSchema& schema, Record& record);
     bool readField(std::istream& stream, const FieldInfo& field);
 
     std::int32_t version_;
     std::uint32_t bytesLeft_ = 0;
+    bool hasRunOutOfMemory_ = false;
 };
 
 /// Writes an entry with a schema and a record of the caller.

@@ -1,7 +1,6 @@
 #include "ZULMetaData/StreamEntries.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <cstring>
 #include <new>
 #include <streambuf>
@@ -125,9 +124,8 @@ bool readEntryBytes(std::string_view bytes, double& time, CursorImage& image, in
     if (record.entrySize != bytes.size() - sizeof record.entrySize ||
         record.justMetadataSize != bytes.size() - baseSize)
         return false;
-    errno = 0;
     reader.ReadMetaDataFields(input, schema, record);
-    if (!image.imageData && errno == ENOMEM) // which a reader takes for an image that does not fit
+    if (reader.hasRunOutOfMemory())
         throw std::bad_alloc();
     return true;
 }

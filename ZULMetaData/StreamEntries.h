@@ -88,7 +88,8 @@ struct TimedValue {
 
 /// Decodes the bytes of an entry that holds a `T`. Returns nothing if they do not fit: if there are too few or too
 /// many, or if a size inside the entry disagrees with them. Fields of a cursor image that do not fit into its data part
-/// are left out, as readers do. The time of a list is the time of its texts, or 0 if the list is empty.
+/// are left out, as readers do. The time of a list is the time of its texts, or 0 if the list is empty. Throws
+/// `std::bad_alloc` if there is no memory for the value.
 template <StreamValue T>
 std::optional<TimedValue<T>> decodeEntry(std::string_view bytes, int version);
 

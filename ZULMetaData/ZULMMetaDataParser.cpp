@@ -141,11 +141,12 @@ bool readAtomSizeAndType(std::istream& stream, std::uint64_t total, std::uint64_
 bool readChunkTypeAndSize(std::istream& stream, std::uint64_t total, std::uint32_t& type, std::uint32_t& size) {
     detail::PositionedInput input = inputAt(stream, total);
     ContainerItem chunk;
-    if (!readChunkHeader(input, chunk))
-        return false;
-    type = swapInt(chunk.type.value);
-    size = chunk.sizeField;
-    return true;
+    chunk.type.value = swapInt(type);
+    const bool isRead = readChunkHeader(input, chunk);
+    type = swapInt(chunk.type.value); // is read even if the size is missing
+    if (isRead)
+        size = chunk.sizeField;
+    return isRead;
 }
 
 } // namespace ParserUtil

@@ -22,10 +22,9 @@ namespace ZULMetaData {
 
 /// Finds the streams of a file once, when it is created, and then reads from the places that it found. A parser has a
 /// single read position, so calls must not overlap.
-class ZULMETADATA_API MetaDataParser {
+class ZULMETADATA_API MetaDataParser : public Container {
 public:
-    using StreamType = Container::Type; ///< `Container::Riff` and the other names of the types are valid too
-    using enum Container::Type;
+    using StreamType = Container::Type; ///< the types have their names here too, such as `MetaDataParser::Riff`
 
     /// The place of a stream. Both numbers are 0 for a kind that the file does not have. The length is the one that the
     /// container declares; it may be larger than the file.

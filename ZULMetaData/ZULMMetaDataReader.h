@@ -43,9 +43,9 @@ struct MetaDataReader {
     /// current one is accepted; otherwise `version` itself is accepted as well. A stream of any other version is
     /// refused with a line on standard output.
     ///
-    /// Throws `std::runtime_error` "invalid meta data entry" if the input ends inside the time or the size of an entry.
-    /// The entries before it have been delivered then. A value that is cut short is delivered with the bytes that
-    /// exist.
+    /// Throws `InvalidEntry` if the input ends inside the time or the size of an entry. The entries before it have been
+    /// delivered then. A value that is cut short is delivered with the bytes that exist, and a cursor image that there
+    /// is no memory for without its image.
     static void parseStream(DataStreamObserver<T>& observer, std::istream& stream, std::uint64_t start,
                             std::uint64_t length, int version);
 

@@ -27,6 +27,7 @@ class CursorImageReader;
 class CursorImageSchema;
 class CursorImageWriter;
 struct FieldInfo;
+class InvalidEntry;
 struct MP4MetaData;
 struct MetaDataHeader;
 struct MetaDataKind;

@@ -94,7 +94,7 @@ export class Recording {
   keyCaptions(showsKeys?: boolean): Entries;
   /** Returns the file's object of `zulm info --json`. */
   info(): object;
-  /** Returns the file's object of `zulm verify --json`. */
+  /** Returns the file's object of `zulm verify --json`, in which images are known by the size that they state. */
   verify(): object;
   /** Returns what `zulm dump --format json` prints, for all streams or for these kinds only. */
   dump(kinds?: string[]): string;

@@ -5,6 +5,8 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <cstddef>
 #include <string>
 #include <utility>
 #include <vector>
@@ -98,6 +100,18 @@ TEST(PNGDecode, GammaIsNotApplied) {
 TEST(PNGDecode, ChunksThatAreNotNeededAreSkipped) {
     const auto chunks = chunk("tEXt", {'k', 0, 'v'}) + chunk("zzZz", Bytes(100, 1)) + chunk("iCCP", {1, 2, 3});
     expectRow(oneRow(1, 8, Grey, {100}, chunks), {100, 100, 100, 255});
+}
+
+TEST(PNGDecode, PixelsMayBeSplitIntoChunksOfEightBytes) {
+    constexpr std::size_t chunkSize = 8;
+    const Bytes stream = stored(Bytes(16385)); // a filter byte and a row
+    auto png = s_signature + header(16384, 1, 8, Grey);
+    for (auto rest = stream.begin(); rest != stream.end();) {
+        const auto next = rest + std::min<std::ptrdiff_t>(chunkSize, stream.end() - rest);
+        png = std::move(png) + chunk("IDAT", {rest, next});
+        rest = next;
+    }
+    EXPECT_TRUE(decoded(png + end()).has_value());
 }
 
 TEST(PNGDecode, BytesBehindTheEndDoNotMatter) {

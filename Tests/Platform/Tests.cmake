@@ -15,11 +15,14 @@ zulm_add_tests(PlatformTests
 target_sources(PlatformTests PRIVATE Platform/ImageTestSupport.cpp)
 target_link_libraries(PlatformTests PRIVATE TIFF::TIFF)
 
+# These limit the memory that is to be had.
+zulm_add_tests(PlatformMemoryTests
+  ImageMemoryTest)
+target_link_libraries(PlatformMemoryTests PRIVATE ZULMetaDataMemoryWatch)
+
 # What takes the place of the codecs in a build without them.
-zulm_add_tests(PlatformStructureTests
-  ImageStructureTest)
-target_sources(PlatformStructureTests PRIVATE
+zulm_add_tests(PlatformWithoutCodecsTests
+  ImageWithoutCodecsTest)
+target_sources(PlatformWithoutCodecsTests PRIVATE
   Platform/ImageTestSupport.cpp
-  ${PROJECT_SOURCE_DIR}/Platform/PNGStructure.cpp
-  ${PROJECT_SOURCE_DIR}/Platform/TIFFStructure.cpp)
-target_link_libraries(PlatformStructureTests PRIVATE TIFF::TIFF)
+  ${PROJECT_SOURCE_DIR}/Platform/ImageWithoutCodecs.cpp)

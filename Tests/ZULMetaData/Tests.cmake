@@ -11,7 +11,7 @@ zulm_add_tests(ZULMetaDataTests
   ParserUtilTest
   Containers/RecordingInfoTest
   Containers/RepairPlanTest
-  Containers/SmallAtomsTest
+  PositionedInputTest
   StreamEntriesTest
   StreamExtentTest
   ValueTypesTest
@@ -21,7 +21,7 @@ zulm_add_tests(ZULMetaDataTests
 
 # These count the memory that the library asks for.
 zulm_add_tests(ZULMetaDataMemoryTests
-  CursorImageRecordTest
+  CursorImageWriterTest
   CursorImageSchemaTest
   ZULMMetaDataCommonTest
   ZULMMetaDataReaderTest)

@@ -555,15 +555,21 @@ TEST_F(SafeSave, FindsOutThatAReaderWouldNotFindTheStream) {
                 HasSubstr("does not show its stream of the kind cursorLocation at offset 62 to a reader"));
 }
 
-TEST_F(SafeSave, FindsOutThatTheMovieIsGone) {
-    writeFile(movie, media());
-    const auto removal = [&](std::uint64_t, std::uint64_t) { std::filesystem::remove(movie); };
-    try {
-        SafeMovieSave(movie, removal).attach(sources({stream("a.dat", locationStream())}));
-        ADD_FAILURE() << "nothing noticed";
-    } catch (const SaveError& error) {
-        EXPECT_THAT(error.what(), HasSubstr("cannot be opened: No such file"));
-    }
+TEST_F(SafeSave, FindsOutThatTheMovieIsGoneOrAnother) {
+    const auto removal = [&](std::uint64_t, std::uint64_t) { std::filesystem::remove(std::string(movie)); };
+    const auto replacement = [&](std::uint64_t, std::uint64_t) {
+        std::filesystem::remove(std::string(movie));
+        writeFile(movie, media());
+    };
+    for (const SafeMovieSave::Progress& change :
+         {SafeMovieSave::Progress(removal), SafeMovieSave::Progress(replacement)})
+        try {
+            writeFile(movie, media());
+            SafeMovieSave(movie, change).attach(sources({stream("a.dat", locationStream())}));
+            ADD_FAILURE() << "nothing noticed";
+        } catch (const SaveError& error) {
+            EXPECT_THAT(error.what(), HasSubstr("was removed or replaced by another program meanwhile"));
+        }
 }
 
 // Trap: the scale factor ------------------------------------------------------------------------------------------

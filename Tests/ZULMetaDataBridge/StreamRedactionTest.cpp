@@ -149,6 +149,12 @@ TEST(StreamRedaction, LetsNoTextHoldOnIntoTheRange) {
               names(textEntry(5, "Mail") + textEntry(10, s_ellipsis) + textEntry(30, "Notes")));
 }
 
+TEST(StreamRedaction, AddsNoEntryBeforeAllTime) {
+    const std::string stream = streamHeader(s_appNames, 1, 0) + textEntry(5, "Shown") + textEntry(1, "Secret");
+    EXPECT_EQ(redacted(stream, within(-s_endless, 2)).bytes,
+              streamHeader(s_appNames, 1, 0) + textEntry(5, "Shown") + textEntry(1, s_hiddenText));
+}
+
 TEST(StreamRedaction, HidesATextWhoseEndATimeThatGoesBackDoesNotTell) {
     EXPECT_EQ(
         redacted(names(textEntry(5, "Salary") + textEntry(4, "Mail") + textEntry(6, "Notes")), within(10, 20)).bytes,

@@ -5,7 +5,7 @@ zulm_add_tests(ZULMetaDataBridgeTests
   EntryDictionaryTest
   EntryTextsTest
   HumanReadableActionsTest
-  InvalidCorpusTest
+  Validation/InvalidCorpusTest
   KeyCaptionsTest
   KeyNamesTest
   KindsTest
@@ -28,5 +28,5 @@ target_link_libraries(ZULMetaDataBridgeTests PRIVATE ZULMetaDataInvalidCorpus)
 
 # These count the memory that the library asks for.
 zulm_add_tests(ZULMetaDataBridgeMemoryTests
-  MetaDataValidatorTest)
+  Validation/MetaDataValidatorTest)
 target_link_libraries(ZULMetaDataBridgeMemoryTests PRIVATE ZULMetaDataInvalidCorpus ZULMetaDataMemoryWatch)

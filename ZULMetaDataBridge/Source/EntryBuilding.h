@@ -28,9 +28,10 @@ ZULMETADATA_API EntryValue entryValue(EntryValue value);
 
 /// A type whose values are stored in an entry as numbers of 32 bits.
 template <class Value>
-concept NumberField = OneOf < std::remove_cvref_t<Value>,
-        std::int32_t, std::uint32_t,
-float, double > ;
+inline constexpr bool isNumberField = OneOf<Value, std::int32_t, std::uint32_t, float, double>;
+
+template <class Value>
+concept NumberField = isNumberField<std::remove_cvref_t<Value>>;
 
 /// Returns the number in the form in which an entry of numbers holds it.
 template <NumberField Value>

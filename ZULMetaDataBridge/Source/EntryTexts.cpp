@@ -1,5 +1,7 @@
 #include "ZULMetaDataBridge/Source/EntryTexts.h"
 
+#include "SharedDependencies/UTF8.h"
+
 #include <algorithm>
 #include <cstddef>
 #include <cstdint>
@@ -8,10 +10,6 @@
 namespace ZULMetaData {
 
 namespace {
-
-bool isContinuation(unsigned char byte) {
-    return (byte & 0xc0) == 0x80;
-}
 
 /// What a first byte announces: the length of its character and the range of its second byte, which keeps out
 /// overlong forms, surrogates and everything above U+10FFFF.
@@ -57,7 +55,7 @@ std::size_t validCharacterLength(std::string_view bytes) {
     if (sequence.length > 1 && (byteAt(1) < sequence.secondFrom || byteAt(1) > sequence.secondTo))
         return 0;
     for (std::size_t index = 2; index < sequence.length; ++index)
-        if (!isContinuation(byteAt(index)))
+        if (!continuesCharacter(static_cast<char>(byteAt(index))))
             return 0;
     return sequence.length;
 }

@@ -4,7 +4,7 @@
 
 namespace ZULMetaData {
 
-MovieFile::MovieFile(const FileLocation& movie) : file_(movie), kept_(file_.size()), end_(kept_) {}
+MovieFile::MovieFile(const FileLocation& movie) : location_(movie), file_(movie), kept_(file_.size()), end_(kept_) {}
 
 ByteSource MovieFile::bytes() const {
     return {file_.size(),

@@ -23,6 +23,9 @@ public:
     /// Returns the movie as it is now, read from the same open file. This object must outlive the source.
     ByteSource bytes() const;
 
+    /// Returns whether the movie is still the file that was opened, and not one that took its name.
+    bool isInPlace() const { return file_.isNamed(location_); }
+
     /// Returns where the movie ends, and the next bytes go.
     std::uint64_t end() const { return end_; }
 
@@ -47,6 +50,7 @@ public:
     void undo();
 
 private:
+    FileLocation location_;
     DurableFile file_;
     std::uint64_t kept_; ///< the bytes before what was appended
     std::uint64_t end_;

@@ -5,6 +5,7 @@
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/RecordingInfo.h"
 #include "ZULMetaData/Containers/RepairPlan.h"
+#include "ZULMetaDataBridge/Source/MetaDataSection.h"
 #include "ZULMetaDataBridge/Source/Redaction/CopyCheck.h"
 #include "ZULMetaDataBridge/Source/Redaction/MediaCopy.h"
 #include "ZULMetaDataBridge/Source/Redaction/NullOutput.h"
@@ -17,6 +18,7 @@
 #include <fstream>
 #include <limits>
 #include <optional>
+#include <stdexcept>
 #include <system_error>
 #include <utility>
 
@@ -62,15 +64,6 @@ std::uint64_t padded(std::uint64_t size) {
     return size + size % 2;
 }
 
-/// Overwrites bytes that were written before.
-template <std::size_t size>
-void patch(std::ostream& out, std::uint64_t offset, const std::array<char, size>& bytes) {
-    const std::uint64_t end = offsetOf(out);
-    out.seekp(static_cast<std::streamoff>(offset));
-    writeBytes(out, bytes);
-    out.seekp(static_cast<std::streamoff>(end));
-}
-
 } // namespace
 
 class RecordingRedactor::Work {
@@ -99,8 +92,7 @@ private:
     RedactedStream redact(const detail::StreamPart& stream, std::ostream& out) const;
     std::vector<RedactedStream> writeContents(std::ostream& out);
     std::vector<RedactedStream> writeStreamFile(std::ostream& out) const;
-    std::vector<RedactedStream> writeMovieMetaData(std::ostream& out) const;
-    std::vector<RedactedStream> writeRIFFMetaData(std::ostream& out) const;
+    std::vector<RedactedStream> writeMetaData(std::ostream& out) const;
     void writeMedia(std::ostream& out);
     void writeBlank(std::ostream& out, const ContainerItem& item) const;
 
@@ -292,7 +284,11 @@ std::vector<RedactedStream> RecordingRedactor::Work::writeContents(std::ostream&
     if (container() == Container::RawStream)
         return writeStreamFile(out);
     writeMedia(out);
-    return isMovie() ? writeMovieMetaData(out) : writeRIFFMetaData(out);
+    try {
+        return writeMetaData(out);
+    } catch (const std::length_error& error) {
+        throw RedactionError(Reason::TooLarge, error.what());
+    }
 }
 
 std::vector<RedactedStream> RecordingRedactor::Work::writeStreamFile(std::ostream& out) const {
@@ -304,54 +300,15 @@ std::vector<RedactedStream> RecordingRedactor::Work::writeStreamFile(std::ostrea
     return streams;
 }
 
-std::vector<RedactedStream> RecordingRedactor::Work::writeMovieMetaData(std::ostream& out) const {
+std::vector<RedactedStream> RecordingRedactor::Work::writeMetaData(std::ostream& out) const {
     std::vector<RedactedStream> streams;
-    const std::uint64_t begin = offsetOf(out);
-    writeBytes(out, detail::extendedAtomHeader(detail::s_metaDataAtom, 0));
-    const std::uint64_t first = offsetOf(out);
-    for (const detail::StreamPart& stream : streams_) {
-        const std::uint64_t start = offsetOf(out);
-        writeBytes(out, detail::extendedAtomHeader(detail::s_streamAtom, 0));
-        streams.push_back(redact(stream, out));
-        if (streams.back().removal == RedactedStream::Kept)
-            patch(out, start, detail::extendedAtomHeader(detail::s_streamAtom, offsetOf(out) - start));
-        else
-            out.seekp(static_cast<std::streamoff>(start));
-    }
-    const std::uint64_t end = offsetOf(out);
-    if (end == first)
-        out.seekp(static_cast<std::streamoff>(begin));
-    else
-        patch(out, begin, detail::extendedAtomHeader(detail::s_metaDataAtom, end - begin));
-    return streams;
-}
-
-std::vector<RedactedStream> RecordingRedactor::Work::writeRIFFMetaData(std::ostream& out) const {
-    std::vector<RedactedStream> streams;
-    const std::uint64_t begin = offsetOf(out);
-    const auto writeHeader = [&out](std::uint64_t offset, FourCC type) {
-        const std::uint64_t size = offsetOf(out) - offset - detail::s_chunkHeaderSize;
-        if (size > s_most32)
-            throw RedactionError(Reason::TooLarge,
-                                 std::to_string(size) + " bytes of metadata are more than a chunk can hold");
-        patch(out, offset, detail::chunkHeader(type, static_cast<std::uint32_t>(size)));
-        out.seekp(static_cast<std::streamoff>(size % 2), std::ios::cur);
-    };
-    writeBytes(out, detail::chunkHeader(detail::s_metaDataAtom, 0));
-    const std::uint64_t first = offsetOf(out);
-    for (const detail::StreamPart& stream : streams_) {
-        const std::uint64_t start = offsetOf(out);
-        writeBytes(out, detail::chunkHeader(detail::s_streamAtom, 0));
-        streams.push_back(redact(stream, out));
-        if (streams.back().removal == RedactedStream::Kept)
-            writeHeader(start, detail::s_streamAtom);
-        else
-            out.seekp(static_cast<std::streamoff>(start));
-    }
-    if (offsetOf(out) == first)
-        out.seekp(static_cast<std::streamoff>(begin));
-    else
-        writeHeader(begin, detail::s_metaDataAtom);
+    MetaDataSection section(out, container());
+    for (const detail::StreamPart& stream : streams_)
+        section.add([&](std::ostream& output) {
+            streams.push_back(redact(stream, output));
+            return streams.back().removal == RedactedStream::Kept;
+        });
+    section.finish();
     return streams;
 }
 

@@ -107,6 +107,11 @@ private:
         throw SaveError(name_, sentence, reason);
     }
 
+    void requireInPlace() const {
+        if (!file_.isInPlace())
+            fail("was removed or replaced by another program meanwhile");
+    }
+
     AttachedStream append(const AttachPlan::Stream& stream);
     void verify(const AttachedStream& written, const ByteSource& bytes, const FoundStreams& found);
     FragmentIndexState treat(SafeMovieSave::FragmentIndex index);
@@ -216,6 +221,7 @@ AttachResult Save::attach(const AttachPlan& plan, SafeMovieSave::FragmentIndex i
         result.streams.push_back(append(stream));
     file_.endAtom();
     result.fragmentIndex = treat(index);
+    requireInPlace();
     const FoundStreams found(file_.bytes());
     for (std::size_t i = 0; i < result.streams.size(); ++i)
         verify(result.streams[i], plan.streams()[i].bytes, found);
@@ -228,6 +234,7 @@ StampResult Save::stamp(const ZCAPHeader& info, SafeMovieSave::FragmentIndex ind
     file_.append({reinterpret_cast<const char*>(&info), sizeof info});
     file_.endAtom();
     result.fragmentIndex = treat(index);
+    requireInPlace();
     const auto infos = readRecordingInfo(file_.bytes(), Container::QuickTime);
     if (infos.empty() || std::memcmp(&infos.back(), &info, sizeof info) != 0)
         fail("does not show its recording info to a reader");

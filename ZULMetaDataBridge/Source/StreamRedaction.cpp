@@ -134,7 +134,7 @@ private:
         const TimeRange* range = times_.rangeAt(decoded.time);
         if constexpr (s_role == TimeRole::Text) {
             if (showsText_ && range)
-                add(range->from, s_hiddenText);
+                add(std::isfinite(range->from) ? range->from : decoded.time, s_hiddenText);
             showsText_ = showsText_ && !range;
         }
         if constexpr (std::same_as<Value, CursorImage>)

@@ -225,14 +225,15 @@ Operation recordingPixels(const std::string& folder) {
     return operation;
 }
 
-/// `run` gives its result as a text, which must be what it is with all the memory there is.
-Operation reporting(const std::string& name, std::function<std::string()> run) {
+/// `run` returns its result as a text. This must be what it is with all the memory there is, or else `without`.
+Operation reporting(const std::string& name, std::function<std::string()> run,
+                    const std::optional<std::string>& without = {}) {
     const auto expected = std::make_shared<std::string>(run());
     const auto found = std::make_shared<std::string>();
     Operation operation{.name = name};
     operation.run = [=] { *found = run(); };
     operation.complaint = [=](bool hasThrown) -> std::string {
-        return hasThrown || *found == *expected ? "" : "told something else: " + *found;
+        return hasThrown || *found == *expected || *found == without ? "" : "told something else: " + *found;
     };
     operation.clear = [=] { *found = std::string(); };
     return operation;
@@ -247,7 +248,8 @@ std::string asText(const Bytes& bytes) {
     return {bytes.begin(), bytes.end()};
 }
 
-/// What there is no memory for must not pass for a damaged picture.
+/// What there is no memory for must not pass for a damaged picture, except for a TIFF file that is read: libtiff does
+/// not say why it failed.
 void addPictures(std::vector<Operation>& operations) {
     const Image picture(2, 1, {255, 0, 0, 255, 0, 255, 0, 128});
     const auto tiff = picture.tiffRepresentation();
@@ -255,11 +257,19 @@ void addPictures(std::vector<Operation>& operations) {
     const auto png = bitmap->pngRepresentation();
     operations.push_back(reporting("encode a TIFF", [=] { return asText(picture.tiffRepresentation()); }));
     operations.push_back(reporting("encode a PNG", [=] { return asText(bitmap->pngRepresentation()); }));
-    for (const auto& encoded : {tiff, png}) {
-        operations.push_back(reporting("decode a picture", [=] { return pixelsIn(Image::fromEncodedBytes(encoded)); }));
-        operations.push_back(reporting("look at a picture", [=] {
-            return std::to_string(Image::infoOfEncodedBytes(encoded).value_or(EncodedImageInfo{}).decodingMemory);
-        }));
+    const auto pixels = [](const auto& encoded) { return pixelsIn(Image::fromEncodedBytes(encoded)); };
+    const auto size = [](const auto& encoded) {
+        const auto info = Image::infoOfEncodedBytes(encoded);
+        return info ? std::to_string(info->decodingMemory) : "no image";
+    };
+    const auto check = [](const auto& encoded) {
+        const bool isImage = Image::checkEncodedBytes(encoded).state == EncodedImageCheck::Decodable;
+        return std::string(isImage ? "an image" : "no image");
+    };
+    for (const auto& [encoded, without] : {std::pair(tiff, std::optional<std::string>("no image")), {png, {}}}) {
+        operations.push_back(reporting("decode a picture", std::bind(pixels, encoded), without));
+        operations.push_back(reporting("look at a picture", std::bind(size, encoded), without));
+        operations.push_back(reporting("check a picture", std::bind(check, encoded), without));
     }
 }
 

@@ -114,11 +114,7 @@ private:
         // Also those that only a repair makes reachable.
         for (const SalvagedStream& stream : StreamSalvage(ByteSource::stream(file), type_).run().streams) {
             Recorded recorded{stream.header.uuid, {}, {}};
-            StreamEntries entries = entriesOf(
-                [&, read = readingFrom(file)](std::uint64_t position, std::span<char> bytes) {
-                    return read(stream.offset + position, bytes);
-                },
-                stream.bytes);
+            StreamEntries entries(ByteSource::stream(file).part(stream.offset, stream.bytes));
             while (const auto entry = entries.next())
                 recorded.entryEnds.push_back(stream.offset + entry->end());
             const std::string alone = copy_ + ".dat";

@@ -3,6 +3,7 @@
 // How parsers read. The parser of each kind adds the name of its list.
 
 #include "../../../SharedDependencies/Export.h"
+#include "../../../ZULMetaData/InvalidEntry.h"
 #include "../../../ZULMetaData/ZULMMetaDataParser.h"
 #include "../EntryBuilding.h"
 #include "../MetaDataKinds.h"
@@ -11,7 +12,6 @@
 
 #include <cstddef>
 #include <memory>
-#include <stdexcept>
 #include <utility>
 
 namespace ZULMetaData {
@@ -54,7 +54,7 @@ private:
             return;
         try {
             stream->loadDataType(Kind::type, observer, Kind::version);
-        } catch (const std::runtime_error&) {
+        } catch (const InvalidEntry&) {
             // An entry is cut short. The entries before it have been collected.
         }
     }

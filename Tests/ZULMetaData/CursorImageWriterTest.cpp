@@ -1,6 +1,7 @@
 // Cursor image entries, byte by byte in both directions, and what is made of hostile ones.
 
 #include "ZULMetaData/CursorImageWriter.h"
+#include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaData/ZULMMetaDataReader.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 
@@ -16,6 +17,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <ios>
+#include <new>
 #include <sstream>
 #include <stdexcept>
 #include <streambuf>
@@ -218,7 +220,7 @@ TEST(ReadRecord, ThatEndsWithTheInputIsWholeAndTheNextIsInvalid) {
     metaDataRead<CursorImage>(stream, &time, &image, 2);
     EXPECT_EQ(asText(image), s_readArrow);
     EXPECT_TRUE(stream.good());
-    EXPECT_THROW(metaDataRead<CursorImage>(stream, &time, &image, 2), std::runtime_error);
+    EXPECT_THROW(metaDataRead<CursorImage>(stream, &time, &image, 2), InvalidEntry);
 }
 
 TEST(ReadRecord, AtTheReportedEndOfTheInputIsInvalidInEveryVersion) {
@@ -227,7 +229,7 @@ TEST(ReadRecord, AtTheReportedEndOfTheInputIsInvalidInEveryVersion) {
         stream.setstate(std::ios_base::eofbit);
         double time = 0;
         CursorImage image;
-        EXPECT_THROW(metaDataRead<CursorImage>(stream, &time, &image, version), std::runtime_error) << version;
+        EXPECT_THROW(metaDataRead<CursorImage>(stream, &time, &image, version), InvalidEntry) << version;
     }
 }
 
@@ -351,10 +353,14 @@ TEST(ImageLargerThanMemory, IsLeftOutWithItsSize) {
     EXPECT_EQ(memory.blocks(), 0);
 }
 
-TEST(ImageLargerThanMemory, IsSkippedToTheNextEntry) {
+/// An entry with an image of one MiB.
+std::string largeRecord() {
     const std::string image(0x100000, 'x');
-    const std::string record = recordOf(le32(0x100000) + hex("03000000 feffffff") + image + hex("05000000 01000000"));
-    std::istringstream stream(record + s_arrowV2);
+    return recordOf(le32(0x100000) + hex("03000000 feffffff") + image + hex("05000000 01000000"));
+}
+
+TEST(ImageLargerThanMemory, IsSkippedToTheNextEntry) {
+    std::istringstream stream(largeRecord() + s_arrowV2);
     MemoryWatch memory;
     memory.refuseAbove(0xfffff);
     double time = 0;
@@ -363,6 +369,28 @@ TEST(ImageLargerThanMemory, IsSkippedToTheNextEntry) {
     EXPECT_EQ(asText(read), "id 7, hotspot 3 -2, type -1, flags 3, no image");
     metaDataRead<CursorImage>(stream, &time, &read, 2);
     EXPECT_EQ(asText(read), s_readArrow);
+}
+
+TEST(ImageLargerThanMemory, IsReportedByTheReader) {
+    std::istringstream stream(s_arrowV2 + largeRecord());
+    MemoryWatch memory;
+    memory.refuseAbove(0xfffff);
+    CursorImage image;
+    double time = 0;
+    Record record{image, time};
+    CursorImageReader reader(2);
+    reader.ReadCursorImageMetaData(stream, CursorImageSchema(2), record);
+    EXPECT_FALSE(reader.hasRunOutOfMemory());
+    reader.ReadCursorImageMetaData(stream, CursorImageSchema(2), record);
+    EXPECT_TRUE(reader.hasRunOutOfMemory());
+}
+
+TEST(ImageLargerThanMemory, IsNotLeftOutOfADecodedEntry) {
+    const std::string entry = largeRecord();
+    EXPECT_EQ(decodeEntry<CursorImage>(entry, 2)->value.imageDataSize, 0x100000U);
+    MemoryWatch memory;
+    memory.refuseAbove(0xfffff);
+    EXPECT_THROW(decodeEntry<CursorImage>(entry, 2), std::bad_alloc);
 }
 
 // ---- Entries cut at every byte --------------------------------------------------------------------------------

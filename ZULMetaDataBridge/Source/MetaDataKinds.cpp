@@ -1,5 +1,9 @@
-#include "Platform/Image.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
+
+#include "Platform/Image.h"
+
+#include <memory>
+#include <utility>
 
 namespace ZULMetaData {
 

@@ -8,6 +8,7 @@
 #include "Tests/ZULMetaData/WatchedStream.h"
 #include "Tests/ZULMetaDataBridge/KindSamples.h"
 
+#include <algorithm>
 #include <limits>
 #include <new>
 #include <set>
@@ -555,7 +556,8 @@ TEST(MetaDataValidator, ThrowsWhereTheDeviceFails) {
     struct FailingBuffer final : WatchedBuffer {
         using WatchedBuffer::WatchedBuffer;
         std::streamsize xsgetn(char* to, std::streamsize count) override {
-            return bytesRead() >= 32 ? 0 : WatchedBuffer::xsgetn(to, count);
+            const auto left = static_cast<std::streamsize>(32 - std::min<std::size_t>(32, bytesRead()));
+            return WatchedBuffer::xsgetn(to, std::min(count, left));
         }
         int_type underflow() override { return bytesRead() >= 32 ? traits_type::eof() : WatchedBuffer::underflow(); }
     } buffer(locationStream());
