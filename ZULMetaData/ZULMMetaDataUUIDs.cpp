@@ -6,10 +6,22 @@
 
 namespace ZULMetaData {
 
-const MetaDataKind* findMetaDataKind(const uuid& type) {
-    const auto isWanted = [&type](const MetaDataKind& kind) { return kind.type == type; };
+namespace {
+
+template <class IsWanted>
+const MetaDataKind* findKind(IsWanted isWanted) {
     const auto kind = std::find_if(s_metaDataKinds.begin(), s_metaDataKinds.end(), isWanted);
     return kind == s_metaDataKinds.end() ? nullptr : &*kind;
+}
+
+} // namespace
+
+const MetaDataKind* findMetaDataKind(const uuid& type) {
+    return findKind([&type](const MetaDataKind& kind) { return kind.type == type; });
+}
+
+const MetaDataKind* findMetaDataKind(std::string_view name) {
+    return findKind([name](const MetaDataKind& kind) { return kind.name == name; });
 }
 
 std::string uuidText(const uuid& type) {

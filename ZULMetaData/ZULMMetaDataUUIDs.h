@@ -101,8 +101,24 @@ inline constexpr std::array<MetaDataKind, 23> s_metaDataKinds{{
     {"hoverRect", s_hoverRectUUID, 1},
 }};
 
-/// Returns the registered kind with this identifier, or null. Prints nothing, unlike `currentVersionForUUID`.
+namespace detail {
+
+/// Returns the version of a registered kind. Another identifier does not compile.
+consteval int versionOf(const uuid& type) {
+    for (const MetaDataKind& kind : s_metaDataKinds)
+        if (kind.type == type)
+            return kind.currentVersion;
+    throw "this kind is not registered";
+}
+
+} // namespace detail
+
+/// Return the registered kind with this identifier or with this name, or null. Print nothing, unlike
+/// `currentVersionForUUID`.
+///@{
 ZULMETADATA_API const MetaDataKind* findMetaDataKind(const uuid& type);
+ZULMETADATA_API const MetaDataKind* findMetaDataKind(std::string_view name);
+///@}
 
 /// Returns the 36 characters that `operator<<` writes.
 ZULMETADATA_API std::string uuidText(const uuid& type);

@@ -1,7 +1,7 @@
 #include "Bindings/JavaScript/EntryColumns.h"
 
-#include "Tools/zulm/Number.h"
-#include "Tools/zulm/Text.h"
+#include "Reports/Number.h"
+#include "Reports/Text.h"
 
 #include <cmath>
 

@@ -1,29 +1,28 @@
 #include "Bindings/JavaScript/zulmetadata_c.h"
 
+#include "Bindings/JavaScript/BlockCache.h"
 #include "Bindings/JavaScript/EntryColumns.h"
-#include "Bindings/JavaScript/SliceBuffer.h"
-#include "Tools/zulm/DumpDocument.h"
-#include "Tools/zulm/InfoReport.h"
-#include "Tools/zulm/JsonWriter.h"
-#include "Tools/zulm/Recording.h"
-#include "Tools/zulm/Text.h"
-#include "Tools/zulm/VerifyReport.h"
-#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "Reports/DumpDocument.h"
+#include "Reports/InfoReport.h"
+#include "Reports/JsonWriter.h"
+#include "Reports/Text.h"
+#include "Reports/VerifyReport.h"
+#include "ZULMetaDataBridge/Source/KeyCaptions.h"
+#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 #include "ZULMetaDataBridge/Source/StoredFields.h"
 
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
 #include <exception>
-#include <functional>
-#include <istream>
 #include <limits>
 #include <list>
 #include <memory>
 #include <new>
 #include <optional>
+#include <span>
 #include <sstream>
 #include <stdexcept>
 #include <string>
@@ -37,27 +36,24 @@
 using namespace ZULMetaData;
 using namespace ZULMetaData::Bindings;
 
-/// In the order in which they need each other.
 struct ZulmRecording {
-    ZulmRecording(ReadSlice read, std::uint64_t size, Container::Type type, const std::string& name)
-        : buffer(std::move(read), size), input(&buffer), recording(input, type, name) {}
-
-    SliceBuffer buffer;
-    std::istream input;
-    Zulm::Recording recording;
-    std::string container;
-    std::optional<double> duration;
-    struct Names {
+    struct Stream {
+        StreamReport report;
         std::string kind; // or its identifier where it has none
         std::string uuid;
+        ZulmStream summary; // points into these texts
     };
-    struct Streams {
-        std::vector<Zulm::StreamInfo> infos;
-        std::vector<Names> names;
-        std::vector<ZulmStream> summaries;
-    };
-    Streams found;
-    Streams hidden;
+
+    ZulmRecording(const ByteSource& bytes, const std::string& name)
+        : recording(bytes, name), duration(recording.duration()), found(summarized(recording.examinedStreams())),
+          hidden(summarized(recording.hiddenStreams())) {}
+
+    static std::vector<Stream> summarized(const std::vector<StreamReport>& reports);
+
+    Recording recording;
+    std::optional<double> duration;
+    std::vector<Stream> found;
+    std::vector<Stream> hidden;
 };
 
 struct ZulmEntries {
@@ -96,47 +92,16 @@ auto orNull(Work work) noexcept -> decltype(work()) {
     return nullptr;
 }
 
-ReadSlice readingWith(ZulmReadAt readAt, void* context) {
-    return [=](std::uint64_t position, void* bytes, std::size_t size) {
-        const std::int64_t got = readAt(context, position, bytes, size);
+ByteSource::Read readingWith(ZulmReadAt readAt, void* context) {
+    return [=](std::uint64_t position, std::span<char> bytes) {
+        const std::int64_t got = readAt(context, position, bytes.data(), bytes.size());
         if (got < 0)
             throw std::system_error(EIO, std::generic_category(), "cannot be read");
-        return std::min(static_cast<std::size_t>(got), size);
+        return std::min(static_cast<std::size_t>(got), bytes.size());
     };
 }
 
-Container::Type typeOf(const ReadSlice& read, std::uint64_t fileSize, const std::string& name) {
-    std::array<char, s_recognitionBytes> first;
-    const std::size_t size = Zulm::orUnreadable(name, [&] { return read(0, first.data(), first.size()); });
-    const RecognizedContainer recognized = recognizeContainer({first.data(), size}, fileSize, name);
-    if (recognized.type == Container::Unknown)
-        throw Zulm::Failure(fmt::format("{}: {}", name, recognized.refusal()));
-    return recognized.type;
-}
-
 constexpr double s_nothing = std::numeric_limits<double>::quiet_NaN();
-
-void summarise(ZulmRecording::Streams& streams, std::vector<Zulm::StreamInfo> infos) {
-    streams.infos = std::move(infos);
-    for (const Zulm::StreamInfo& info : streams.infos)
-        streams.names.push_back({ZULMetaData::metaDataKindName(info.type), ZULMetaData::uuidText(info.type)});
-    for (std::size_t i = 0; i < streams.infos.size(); ++i) {
-        const Zulm::StreamInfo& info = streams.infos[i];
-        streams.summaries.push_back({streams.names[i].kind.c_str(), streams.names[i].uuid.c_str(), info.version,
-                                     info.isDecodable ? info.entries : 0, info.range.length, info.range.offset,
-                                     info.firstTime.value_or(s_nothing), info.lastTime.value_or(s_nothing),
-                                     info.isDecodable ? 1 : 0});
-    }
-}
-
-void fillIn(ZulmRecording& opened) {
-    Zulm::Recording& recording = opened.recording;
-    opened.container = recording.container();
-    opened.duration = movieDuration(recording.parser());
-    Zulm::requireRead(opened.input, recording.name());
-    summarise(opened.found, recording.streams());
-    summarise(opened.hidden, recording.hiddenStreams());
-}
 
 /// The type of the column that a field of this type fills.
 template <class Value>
@@ -155,40 +120,31 @@ constexpr ZulmColumnType columnType() {
 
 /// Collects the entries of a stream.
 template <class Kind>
-class EntryCollector final : public DataStreamObserver<typename Kind::Value> {
-public:
+void collect(Recording& recording, const StreamReport& stream, ZulmEntries& entries) {
     using Value = typename Kind::Value;
-
-    explicit EntryCollector(ZulmEntries& entries) : entries_(entries) {
-        ZULMetaData::detail::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
-            entries.columns.emplace_back(key, columnType<Stored>());
-        });
-    }
-
-    bool dataRead(double time, const Value& value) override {
-        entries_.times.push_back(time);
-        auto column = entries_.columns.begin();
+    ZULMetaData::detail::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
+        entries.columns.emplace_back(key, columnType<Stored>());
+    });
+    recording.readEntries<Value>(stream, [&entries](double time, const Value& value) {
+        entries.times.push_back(time);
+        auto column = entries.columns.begin();
         ZULMetaData::detail::visitStoredFields<Kind>(
             value, [&column](const char*, const auto& stored) { (column++)->add(stored); });
         return true;
-    }
-
-private:
-    ZulmEntries& entries_;
-};
-
-const Zulm::StreamInfo& infoNamed(const ZulmRecording& opened, const std::string& kind) {
-    const auto& [infos, names, summaries] = opened.found;
-    for (std::size_t i = 0; i < infos.size(); ++i)
-        if (names[i].kind == kind || names[i].uuid == kind)
-            return infos[i];
-    throw Zulm::Failure(fmt::format("{}: holds no stream {}", opened.recording.name(), kind));
+    });
 }
 
-void requireDecodable(const ZulmRecording& opened, const Zulm::StreamInfo& info) {
-    if (!info.isDecodable)
-        throw Zulm::Failure(fmt::format("{}: entries of {}, version {}, cannot be decoded", opened.recording.name(),
-                                        ZULMetaData::metaDataKindName(info.type), info.version));
+const StreamReport& streamNamed(const ZulmRecording& opened, const std::string& kind) {
+    for (const ZulmRecording::Stream& stream : opened.found)
+        if (stream.kind == kind || stream.uuid == kind)
+            return stream.report;
+    throw std::runtime_error(fmt::format("{}: holds no stream {}", opened.recording.name(), kind));
+}
+
+void requireDecodable(const ZulmRecording& opened, const StreamReport& stream) {
+    if (!isDecodable(stream.header()))
+        throw std::runtime_error(fmt::format("{}: entries of {}, version {}, cannot be decoded",
+                                             opened.recording.name(), stream.name(), stream.version));
 }
 
 void addViews(ZulmEntries& entries) {
@@ -196,26 +152,23 @@ void addViews(ZulmEntries& entries) {
         entries.views.push_back(column.view());
 }
 
-std::unique_ptr<ZulmEntries> readEntries(ZulmRecording& opened, const Zulm::StreamInfo& info) {
-    requireDecodable(opened, info);
+std::unique_ptr<ZulmEntries> readEntries(ZulmRecording& opened, const StreamReport& stream) {
+    requireDecodable(opened, stream);
     auto entries = std::make_unique<ZulmEntries>();
-    RecordedKinds::visit(info.type, [&]<class Kind>() {
-        EntryCollector<Kind> collector(*entries);
-        opened.recording.readEntries<typename Kind::Value>(info, collector);
-    });
+    RecordedKinds::visit(stream.type, [&]<class Kind>() { collect<Kind>(opened.recording, stream, *entries); });
     addViews(*entries);
     return entries;
 }
 
 /// One row for each key.
 std::unique_ptr<ZulmEntries> readKeyCaptions(ZulmRecording& opened, bool showsKeys) {
-    const Zulm::StreamInfo& info = infoNamed(opened, metaDataKindName(KeyboardActionKind::type));
-    requireDecodable(opened, info);
-    MetaDataObserver<KeyStroke> read;
-    opened.recording.readEntries<KeyStroke>(info, read);
+    const StreamReport& stream = streamNamed(opened, metaDataKindName(KeyboardActionKind::type));
+    requireDecodable(opened, stream);
     std::vector<KeyEvent> keys;
-    for (std::size_t i = 0; i < read.values.size(); ++i)
-        keys.push_back({read.times[i], read.values[i]});
+    opened.recording.readEntries<KeyStroke>(stream, [&keys](double time, const KeyStroke& key) {
+        keys.push_back({time, key});
+        return true;
+    });
     auto entries = std::make_unique<ZulmEntries>();
     entries->columns = {{"label", ZulmTexts}, {"isTyped", ZulmInt32}, {"first", ZulmInt32}, {"end", ZulmReal}};
     for (const KeyCaption& caption : keyCaptions(std::move(keys), showsKeys)) {
@@ -232,33 +185,49 @@ std::unique_ptr<ZulmEntries> readKeyCaptions(ZulmRecording& opened, bool showsKe
     return entries;
 }
 
-std::vector<uuid> typesNamed(const ZulmRecording& opened, const char* kinds) {
-    std::vector<uuid> types;
+std::vector<StreamReport> streamsNamed(const ZulmRecording& opened, const char* kinds) {
+    std::vector<StreamReport> streams;
     if (!kinds) {
-        for (const Zulm::StreamInfo& info : opened.found.infos)
-            types.push_back(info.type);
-        return types;
+        for (const ZulmRecording::Stream& stream : opened.found)
+            streams.push_back(stream.report);
+        return streams;
     }
     std::istringstream list(kinds);
-    for (std::string kind; std::getline(list, kind, ',');)
-        if (const uuid type = infoNamed(opened, kind).type; std::find(types.begin(), types.end(), type) == types.end())
-            types.push_back(type);
-    return types;
+    for (std::string kind; std::getline(list, kind, ',');) {
+        const StreamReport& stream = streamNamed(opened, kind);
+        if (std::none_of(streams.begin(), streams.end(), [&](const auto& each) { return each.type == stream.type; }))
+            streams.push_back(stream);
+    }
+    return streams;
 }
 
 } // namespace
+
+std::vector<ZulmRecording::Stream> ZulmRecording::summarized(const std::vector<StreamReport>& reports) {
+    std::vector<Stream> streams;
+    for (const StreamReport& report : reports)
+        streams.push_back({report, report.name(), uuidText(report.type), {}});
+    for (auto& [report, kind, identifier, summary] : streams) {
+        const bool isKnown = isDecodable(report.header());
+        summary = {kind.c_str(),
+                   identifier.c_str(),
+                   report.version,
+                   isKnown ? report.wholeEntries : 0,
+                   report.declaredBytes,
+                   report.offset,
+                   report.firstTime.value_or(s_nothing),
+                   report.lastTime.value_or(s_nothing),
+                   isKnown ? 1 : 0};
+    }
+    return streams;
+}
 
 const char* zulm_last_error(void) {
     return lastError().empty() ? "out of memory" : lastError().c_str();
 }
 
 ZulmRecording* zulm_open(ZulmReadAt readAt, void* context, uint64_t size, const char* name) {
-    return orNull([&] {
-        const ReadSlice read = readingWith(readAt, context);
-        auto opened = std::make_unique<ZulmRecording>(read, size, typeOf(read, size, name), name);
-        fillIn(*opened);
-        return opened.release();
-    });
+    return orNull([&] { return new ZulmRecording(cachedInBlocks({size, readingWith(readAt, context)}), name); });
 }
 
 void zulm_close(ZulmRecording* recording) {
@@ -266,7 +235,7 @@ void zulm_close(ZulmRecording* recording) {
 }
 
 const char* zulm_container(const ZulmRecording* recording) {
-    return recording->container.c_str();
+    return containerName(recording->recording.container());
 }
 
 double zulm_duration(const ZulmRecording* recording) {
@@ -274,27 +243,27 @@ double zulm_duration(const ZulmRecording* recording) {
 }
 
 size_t zulm_stream_count(const ZulmRecording* recording) {
-    return recording->found.summaries.size();
+    return recording->found.size();
 }
 
 const ZulmStream* zulm_stream(const ZulmRecording* recording, size_t index) {
-    return &recording->found.summaries[index];
+    return &recording->found[index].summary;
 }
 
 size_t zulm_hidden_count(const ZulmRecording* recording) {
-    return recording->hidden.summaries.size();
+    return recording->hidden.size();
 }
 
 const ZulmStream* zulm_hidden(const ZulmRecording* recording, size_t index) {
-    return &recording->hidden.summaries[index];
+    return &recording->hidden[index].summary;
 }
 
 ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind) {
-    return orNull([&] { return readEntries(*recording, infoNamed(*recording, kind)).release(); });
+    return orNull([&] { return readEntries(*recording, streamNamed(*recording, kind)).release(); });
 }
 
 ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index) {
-    return orNull([&] { return readEntries(*recording, recording->hidden.infos[index]).release(); });
+    return orNull([&] { return readEntries(*recording, recording->hidden[index].report).release(); });
 }
 
 ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys) {
@@ -327,7 +296,7 @@ ZulmText* zulm_info(ZulmRecording* recording) {
 
 ZulmText* zulm_verify(ZulmRecording* recording) {
     return orNull([&] {
-        Zulm::Recording& opened = recording->recording;
+        Recording& opened = recording->recording;
         return new ZulmText{Zulm::jsonLines(Zulm::verifyDocument(opened.name(), opened.validation()))};
     });
 }
@@ -335,7 +304,7 @@ ZulmText* zulm_verify(ZulmRecording* recording) {
 ZulmText* zulm_dump(ZulmRecording* recording, const char* kinds) {
     return orNull([&] {
         auto text = std::make_unique<ZulmText>();
-        Zulm::writeDump(recording->recording, typesNamed(*recording, kinds),
+        Zulm::writeDump(recording->recording, streamsNamed(*recording, kinds),
                         [&](std::string_view piece) { text->bytes += piece; });
         return text.release();
     });

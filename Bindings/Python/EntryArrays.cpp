@@ -62,13 +62,13 @@ py::dtype entryType() {
 
 /// The stored bytes themselves, in memory that the array owns.
 template <class Kind>
-py::array arrayOverStream(const StreamSource::Bytes& stream) {
+py::array arrayOverStream(const ByteSource& stream) {
     constexpr std::size_t entrySize = sizeof(double) + sizeof(typename Kind::Value);
     std::unique_ptr<char[]> bytes;
     std::size_t count = 0;
     {
         const py::gil_scoped_release others;
-        const std::uint64_t body = stream.length - std::min<std::uint64_t>(stream.length, s_metaDataHeaderSize);
+        const std::uint64_t body = stream.size() - std::min<std::uint64_t>(stream.size(), s_metaDataHeaderSize);
         const std::size_t whole = static_cast<std::size_t>(body / entrySize) * entrySize;
         bytes.reset(new char[whole]);
         count = stream.read(s_metaDataHeaderSize, {bytes.get(), whole}) / entrySize;
@@ -82,10 +82,10 @@ py::array arrayOverStream(const StreamSource::Bytes& stream) {
 }
 
 template <class Value>
-std::vector<TimedValue<Value>> decodeAll(const StreamSource::Bytes& stream) {
+std::vector<TimedValue<Value>> decodeAll(const ByteSource& stream) {
     const py::gil_scoped_release others;
     std::vector<TimedValue<Value>> decoded;
-    StreamEntries entries = entriesOf(stream.read, stream.length);
+    StreamEntries entries(stream);
     while (const auto entry = entries.next())
         if (auto fitting = decodeEntry<Value>(entries.bytesOf(*entry), entries.header()->version))
             decoded.push_back(std::move(*fitting));
@@ -133,7 +133,7 @@ void fillColumns(py::array& array, const std::vector<TimedValue<CursorImage>>& e
 }
 
 template <class Kind>
-py::array entriesOfKind(const StreamSource::Bytes& stream) {
+py::array entriesOfKind(const ByteSource& stream) {
     using Value = typename Kind::Value;
     if constexpr (FixedSizeValue<Value>) {
         return arrayOverStream<Kind>(stream);
@@ -152,12 +152,10 @@ py::array entriesOfKind(const StreamSource::Bytes& stream) {
 } // namespace
 
 const MetaDataKind& kindNamed(const std::string& name) {
-    const auto found = std::find_if(s_metaDataKinds.begin(), s_metaDataKinds.end(), [&name](const MetaDataKind& kind) {
-        return kind.name == name && RecordedKinds::visit(kind.type, []<class Kind>() {});
-    });
-    if (found == s_metaDataKinds.end())
+    const MetaDataKind* kind = findMetaDataKind(name);
+    if (!kind || !RecordedKinds::visit(kind->type, []<class Kind>() {}))
         throw py::key_error(name);
-    return *found;
+    return *kind;
 }
 
 py::dtype typeOfEntries(const uuid& kind) {
@@ -182,8 +180,8 @@ py::list coordinatesOf(const uuid& kind) {
 }
 
 py::array readEntries(const StreamSource& source) {
-    const StreamSource::Bytes stream = source.open();
-    const std::optional<MetaDataHeader> header = StreamEntries(stream.read, stream.length).header();
+    const ByteSource stream = source.open();
+    const std::optional<MetaDataHeader> header = StreamEntries(stream).header();
     if (!header || !isDecodable(*header))
         throwValueError(source.name() +
                         ": the entries cannot be decoded: the version of the stream is not known, or its "

@@ -1,25 +1,19 @@
 // zulmetadata._core, the module below the package in zulmetadata/. Its types are described in _core.pyi.
 
 #include "Bindings/Python/EntryArrays.h"
-#include "Bindings/Python/FileError.h"
 #include "Bindings/Python/PythonTexts.h"
 #include "Bindings/Python/StreamWriter.h"
-#include "ZULMetaData/Containers/ContainerRecognition.h"
-#include "ZULMetaData/Containers/MovieDuration.h"
-#include "ZULMetaData/Containers/RecordingInfo.h"
 #include "ZULMetaDataBridge/Source/HumanReadableActions.h"
 #include "ZULMetaDataBridge/Source/KeyNames.h"
-#include "ZULMetaDataBridge/Source/KindEntries.h"
+#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
-#include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
 #include <pybind11/numpy.h>
 #include <pybind11/pybind11.h>
 #include <pybind11/stl.h>
 #include <pybind11/stl/filesystem.h>
 
-#include <cerrno>
-#include <fstream>
 #include <optional>
 #include <utility>
 
@@ -28,66 +22,51 @@ namespace ZULMetaData::Python {
 namespace {
 
 /// Throws `OSError` for a file that cannot be opened or read, `ValueError` for one that can hold no metadata.
-std::unique_ptr<MetaDataParser> openRecording(const FileLocation& file) {
+Recording openRecording(const FileLocation& file) {
     try {
-        return naming(file, [&] { return openContainer(utf8Path(file)); });
+        return Recording(file);
     } catch (const FileError&) {
         throw;
     } catch (const std::runtime_error& refusal) {
-        throwValueError(utf8Path(file) + ": " + refusal.what());
+        throwValueError(refusal.what());
     }
 }
 
 /// A stream of a recording, found when the recording was opened.
 struct RecordedStream {
     FileLocation file;
-    uuid type{};
+    StreamInfo place;
     MetaDataHeader header;
-    std::uint64_t offset = 0;
-    std::uint64_t bytes = 0; ///< header included, as the container declares
 
-    StreamSource source() const { return StreamSource::part(file, offset, bytes); }
+    /// Opens the file when it is used.
+    StreamSource source() const { return StreamSource::part(file, place.offset, place.declaredBytes); }
 };
 
-class RecordingFile {
-public:
-    explicit RecordingFile(const FileLocation& file) {
-        const auto parser = openRecording(file);
-        container_ = parser->getStreamType();
-        duration_ = movieDuration(*parser);
-        for (const ZCAPHeader& info : readRecordingInfo(*parser))
-            creators_.push_back(info.creator);
-        for (const uuid& type : parser->getAvailableMetaDataUUIDs()) {
-            const auto place = parser->fileDataForUUID(type);
-            RecordedStream stream{file, type, {}, place.offset, place.length};
-            const StreamSource::Bytes bytes = stream.source().open();
-            if (const auto header = StreamEntries(bytes.read, bytes.length).header())
-                stream.header = *header;
-            streams_.push_back(stream);
-        }
-    }
-
-    std::string container() const {
-        return container_ == Container::QuickTime ? "movie" : container_ == Container::Riff ? "riff" : "stream";
-    }
-    std::optional<double> duration() const { return duration_; }
-    const std::vector<CreatorAttributes>& creators() const { return creators_; }
-    const std::vector<RecordedStream>& streams() const { return streams_; }
-
-private:
-    Container::Type container_ = Container::Unknown;
-    std::optional<double> duration_;
-    std::vector<CreatorAttributes> creators_;
-    std::vector<RecordedStream> streams_;
+/// What a recording was found to hold. It keeps no file open.
+struct RecordingFile {
+    std::string container;
+    std::optional<double> duration;
+    std::vector<CreatorAttributes> creators;
+    std::vector<RecordedStream> streams;
 };
+
+RecordingFile lookInto(const FileLocation& file) {
+    const Recording recording = openRecording(file);
+    RecordingFile found{containerName(recording.container()), recording.duration(), {}, {}};
+    for (const ZCAPHeader& info : recording.creators())
+        found.creators.push_back(info.creator);
+    for (const StreamInfo& stream : recording.streams())
+        found.streams.push_back({file, stream, recording.entriesOf(stream).header().value_or(MetaDataHeader())});
+    return found;
+}
 
 py::bytes bytesOf(const RecordedStream& stream) {
     std::string bytes;
     {
         const py::gil_scoped_release others;
-        naming(stream.file, [&] {
-            const StreamSource::Bytes opened = stream.source().open();
-            bytes.resize(static_cast<std::size_t>(opened.length));
+        orFileError(utf8Path(stream.file), [&] {
+            const ByteSource opened = stream.source().open();
+            bytes.resize(static_cast<std::size_t>(opened.size()));
             bytes.resize(opened.read(0, bytes));
         });
     }
@@ -95,22 +74,21 @@ py::bytes bytesOf(const RecordedStream& stream) {
 }
 
 /// Stream files, and streams of other recordings.
-std::vector<StreamSource> sourcesOf(const py::iterable& streams) {
+std::vector<StreamSource> sourcesOf(const py::iterable& streams, bool unchecked) {
     std::vector<StreamSource> sources;
-    for (const py::handle stream : streams)
-        if (py::isinstance<RecordedStream>(stream))
-            sources.push_back(stream.cast<RecordedStream>().source());
-        else
-            sources.push_back(StreamSource::file(stream.cast<FileLocation>()));
+    for (const py::handle stream : streams) {
+        const StreamSource source = py::isinstance<RecordedStream>(stream)
+                                        ? stream.cast<RecordedStream>().source()
+                                        : StreamSource::file(stream.cast<FileLocation>());
+        sources.push_back(unchecked ? source.unchecked() : source);
+    }
     return sources;
 }
 
 AttachResult attach(const FileLocation& movie, const py::iterable& streams, bool replace, bool unchecked) {
-    const std::vector<StreamSource> sources = sourcesOf(streams);
+    const std::vector<StreamSource> sources = sourcesOf(streams, unchecked);
     const py::gil_scoped_release others;
-    return SafeMovieSave(movie).attach(sources,
-                                       replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse,
-                                       unchecked ? SafeMovieSave::Sources::Unchecked : SafeMovieSave::Sources::Checked);
+    return SafeMovieSave(movie).attach(sources, replace ? ExistingStreams::Supersede : ExistingStreams::Refuse);
 }
 
 CreatorAttributes stamp(const FileLocation& movie, const py::object& creator, const py::object& version) {
@@ -125,15 +103,13 @@ RepairPlan repair(const FileLocation& movie, bool dryRun) {
 }
 
 ValidationReport verify(const FileLocation& file) {
-    (void)openRecording(file); // tells what is wrong with a file that cannot be opened
+    Recording recording = openRecording(file);
     const py::gil_scoped_release others;
-    return naming(file, [&] { return validateRecording(file); });
+    return recording.validation();
 }
 
 const char* stateOf(const RepairPlan& plan) {
-    return plan.state == RepairPlan::Whole        ? "whole"
-           : plan.state == RepairPlan::Repairable ? "repairable"
-                                                  : "unrepairable";
+    return repairStateName(plan.state);
 }
 
 const char* reasonOf(const SaveError& error) {
@@ -152,6 +128,21 @@ void setSaveError(const py::handle& type, const SaveError& error) {
     exception.attr("sentence") = pathText(error.sentence());
     exception.attr("reason") = reasonOf(error);
     PyErr_SetObject(type.ptr(), exception.ptr());
+}
+
+/// Lets Python catch `FileError` and `std::system_error` as `OSError`.
+void registerFileErrors() {
+    py::register_exception_translator([](std::exception_ptr thrown) {
+        py::tuple arguments;
+        try {
+            std::rethrow_exception(std::move(thrown));
+        } catch (const FileError& error) {
+            arguments = py::make_tuple(error.code().value(), error.code().message(), pathText(error.file()));
+        } catch (const std::system_error& error) {
+            arguments = py::make_tuple(error.code().value(), pathText(error.what()));
+        }
+        PyErr_SetObject(PyExc_OSError, arguments.ptr());
+    });
 }
 
 void addErrors(py::module_& module) {
@@ -180,37 +171,41 @@ void addReading(py::module_& module) {
     py::class_<RecordedStream>(module, "RecordedStream",
                                "A stream of a recording: its place in the file, its kind and its version.")
         .def_property_readonly(
-            "kind", [](const RecordedStream& stream) { return metaDataKindName(stream.type); },
+            "kind", [](const RecordedStream& stream) { return stream.place.name(); },
             "The name of the kind, or its UUID if it has no name.")
         .def_property_readonly(
-            "uuid", [](const RecordedStream& stream) { return uuidText(stream.type); },
+            "uuid", [](const RecordedStream& stream) { return uuidText(stream.place.type); },
             "The identifier of the kind, as text.")
         .def_property_readonly(
             "version", [](const RecordedStream& stream) { return stream.header.version; },
             "The version of the entries.")
-        .def_readonly("offset", &RecordedStream::offset, "The position of the header in the file.")
-        .def_readonly("bytes", &RecordedStream::bytes, "The size that the container declares, header included.")
+        .def_property_readonly(
+            "offset", [](const RecordedStream& stream) { return stream.place.offset; },
+            "The position of the header in the file.")
+        .def_property_readonly(
+            "bytes", [](const RecordedStream& stream) { return stream.place.declaredBytes; },
+            "The size that the container declares, header included.")
         .def_property_readonly(
             "is_decodable", [](const RecordedStream& stream) { return isDecodable(stream.header); },
             "True if `read` knows the kind and the version.")
         .def(
             "read",
             [](const RecordedStream& stream) {
-                return naming(stream.file, [&] { return readEntries(stream.source()); });
+                return orFileError(utf8Path(stream.file), [&] { return readEntries(stream.source()); });
             },
             "Returns the whole entries, as a NumPy array of records.")
         .def("raw", bytesOf, "Returns the bytes of the stream, header included.")
         .def("__repr__", [](const RecordedStream& stream) {
             return py::str("<RecordedStream {} version={} offset={} bytes={}>")
-                .format(metaDataKindName(stream.type), stream.header.version, stream.offset, stream.bytes);
+                .format(stream.place.name(), stream.header.version, stream.place.offset, stream.place.declaredBytes);
         });
     py::class_<RecordingFile>(module, "RecordingFile")
-        .def(py::init([](const FileLocation& file) { return naming(file, [&] { return RecordingFile(file); }); }),
-             py::arg("path"))
-        .def_property_readonly("container", &RecordingFile::container)
-        .def_property_readonly("duration", &RecordingFile::duration)
-        .def_property_readonly("creators", &RecordingFile::creators)
-        .def_property_readonly("streams", &RecordingFile::streams);
+        .def(py::init(&lookInto), py::arg("path"))
+        .def_property_readonly("container",
+                               [](const RecordingFile& file) { return py::str(file.container).attr("lower")(); })
+        .def_readonly("duration", &RecordingFile::duration)
+        .def_readonly("creators", &RecordingFile::creators)
+        .def_readonly("streams", &RecordingFile::streams);
     py::class_<CreatorAttributes>(module, "Creator", "A stamp of a movie: the name of the platform and two versions.")
         .def_property_readonly(
             "name", [](const CreatorAttributes& creator) { return pythonText(creator.name()); },

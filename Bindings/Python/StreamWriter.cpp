@@ -1,9 +1,9 @@
 #include "Bindings/Python/StreamWriter.h"
 
-#include "Bindings/Python/FileError.h"
 #include "Bindings/Python/PythonTexts.h"
 #include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
+#include "ZULMetaDataBridge/Source/FileError.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
 
 #include <cerrno>
@@ -11,6 +11,7 @@
 #include <cstring>
 #include <limits>
 #include <string_view>
+#include <system_error>
 #include <utility>
 #include <vector>
 
@@ -120,7 +121,7 @@ private:
 
     void throwUnlessHealthy() const {
         if (!stream().good())
-            throw FileError::ofErrno(file_);
+            throw FileError(utf8Path(file_), std::system_error(errno != 0 ? errno : EIO, std::generic_category()));
     }
 
     void put(const py::array& records) {

@@ -1,6 +1,6 @@
 zulm_add_tests(BindingsTests
-  CInterfaceTest
-  SliceBufferTest)
+  BlockCacheTest
+  CInterfaceTest)
 target_link_libraries(BindingsTests PRIVATE zulmetadata_c ZULMetaDataToolTestSupport ZULMetaDataInvalidCorpus)
 add_dependencies(BindingsTests zulm)
 add_test(NAME Bindings/HeaderIsC

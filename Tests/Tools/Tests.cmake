@@ -29,9 +29,7 @@ zulm_add_tests(ToolsTests
   GrepCommandTest
   InfoCommandTest
   JsonReportTest
-  JsonWriterTest
   ManualTest
-  NumberTest
   OutOfMemoryTest
   OutputFileTest
   RedactCommandTest
@@ -39,7 +37,6 @@ zulm_add_tests(ToolsTests
   SalvageCommandTest
   SchemaTest
   StampCommandTest
-  TextTest
   ToolRunTest
   VerifyCommandTest
   ViewCommandTest)

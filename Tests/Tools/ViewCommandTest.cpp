@@ -70,7 +70,6 @@ TEST_F(ViewCommand, PutsWhatIsKnownOfARecordingIntoThePage) {
     EXPECT_EQ(recording.at("schema"), "zulm.view");
     EXPECT_EQ(recording.at("schema_version"), 1);
     EXPECT_EQ(recording.at("name"), std::filesystem::path(movie()).filename().string());
-    EXPECT_EQ(recording.at("moviePoster"), nullptr);
     EXPECT_EQ(recording.at("info"), reportOf("info", movie()));
     EXPECT_EQ(recording.at("verify"), reportOf("verify", movie()));
 }

@@ -38,21 +38,15 @@ constexpr bool hasSamples(const uuid& type) {
     return haveSamplesFor(type, static_cast<EveryKind*>(nullptr));
 }
 
-constexpr bool isRegistered(const uuid& type, int version) {
-    return std::any_of(s_metaDataKinds.begin(), s_metaDataKinds.end(),
-                       [&](const MetaDataKind& kind) { return kind.type == type && kind.currentVersion == version; });
-}
-
-constexpr bool everyRecordedKindIsRegisteredAndHasSamples() {
+constexpr bool everyRecordedKindHasSamples() {
     bool all = true;
-    RecordedKinds::forEach(
-        [&]<class Kind>() { all = all && isRegistered(Kind::type, Kind::version) && hasSamples(Kind::type); });
+    RecordedKinds::forEach([&]<class Kind>() { all = all && hasSamples(Kind::type); });
     return all;
 }
 
 static_assert(RecordedKinds::size == 17);
 static_assert(std::tuple_size_v<EveryKind> == 17);
-static_assert(everyRecordedKindIsRegisteredAndHasSamples());
+static_assert(everyRecordedKindHasSamples());
 
 const std::set<std::string_view> s_kindsWithoutClasses{"caretPosition",          "miscellany",
                                                        "recordingCutTimes",      "deviceFrameCoordinates",

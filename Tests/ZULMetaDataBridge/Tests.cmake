@@ -13,6 +13,7 @@ zulm_add_tests(ZULMetaDataBridgeTests
   MetaDataExcerptTest
   ParserFamilyTest
   RecordingRedactionTest
+  RecordingTest
   SafeMovieSaveTest
   StreamRedactionTest
   StreamRetimingTest

@@ -1,10 +1,10 @@
+#include "Reports/Layout.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/Layout.h"
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
@@ -23,7 +23,7 @@ struct AtomsOptions {
 };
 
 Json itemDocument(const LayoutItem& entry) {
-    Json document{{"type", printable(entry.item.type)},
+    Json document{{"type", printable(entry.item.type.text())},
                   {"offset", entry.item.offset},
                   {"size", entry.size},
                   {"header", entry.headerForm()},
@@ -39,7 +39,7 @@ Json itemDocument(const LayoutItem& entry) {
 void writeReport(Recording& recording, const LayoutVisitor& ends, JsonWriter& writer) {
     writer.beginObject();
     writer.members(fileHeader(recording.name()));
-    writer.member("container", recording.container());
+    writer.member("container", containerName(recording.container()));
     writer.member("bytes", recording.size());
     writer.beginArray("items");
     const auto begin = [&](const LayoutItem& item, bool) {
@@ -65,7 +65,7 @@ std::string remarkOn(const LayoutItem& entry) {
 }
 
 void printItem(const LayoutItem& entry, bool isChild) {
-    const std::string type = (isChild ? "  " : "") + printable(entry.item.type);
+    const std::string type = (isChild ? "  " : "") + printable(entry.item.type.text());
     std::string line = fmt::format("  {:<12}  {:>16}  {:>16}  {:<10}  {}", type, entry.item.offset, entry.size,
                                    entry.headerForm(), remarkOn(entry));
     line.erase(line.find_last_not_of(' ') + 1);
@@ -73,7 +73,8 @@ void printItem(const LayoutItem& entry, bool isChild) {
 }
 
 void print(Recording& recording, const LayoutVisitor& ends) {
-    writeOutput(fmt::format("{}: {}, {} bytes\n", shown(recording.name()), recording.container(), recording.size()));
+    writeOutput(fmt::format("{}: {}, {} bytes\n", shown(recording.name()), containerName(recording.container()),
+                            recording.size()));
     writeOutput(
         heading(fmt::format("  {:<12}  {:>16}  {:>16}  {:<10}  {}", "type", "offset", "size", "header", "stream")) +
         '\n');
@@ -83,8 +84,8 @@ void print(Recording& recording, const LayoutVisitor& ends) {
 
 ExitCode showAtoms(const std::string& path, RunReport& report) {
     const InputFile input(path);
-    Recording recording(input.path(), input.name());
-    if (recording.parser().getStreamType() == Container::RawStream)
+    Recording recording = input.open();
+    if (recording.container() == Container::RawStream)
         throw Failure(
             fmt::format("{}: a bare stream has no atoms; 'zulm info {}' shows what it is", path, shellWord(path)));
     ExitCode code = ExitFine;

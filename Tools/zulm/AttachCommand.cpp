@@ -1,17 +1,19 @@
+#include "Reports/Text.h"
 #include "Tools/zulm/AttachTimes.h"
+#include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
 #include <algorithm>
 #include <filesystem>
-#include <fstream>
 #include <set>
 
 namespace Zulm {
@@ -37,19 +39,18 @@ struct AttachOptions {
 
 /// What is to be attached, and whether something of it is lost already.
 struct Streams {
-    std::vector<StreamSource> sources;
-    std::vector<StreamSource> files; ///< those of the sources that are stream files
-    std::vector<std::string> empty;  ///< stream files that were left out
-    std::set<uuid> types;            ///< of the stream files
+    std::vector<StreamSource> sources; ///< only stream files are checked
+    std::vector<std::string> empty;    ///< stream files that were left out
+    std::set<uuid> types;              ///< of the stream files
     ExitCode code = ExitFine;
 };
 
 uuid typeOfStreamFile(const std::string& path) {
     requireFile(path);
-    std::ifstream file = openInput(path);
-    const RecognizedContainer recognized = orUnreadable(path, [&] { return recognizeContainer(file, path); });
+    const RecognizedContainer recognized =
+        orFileError(path, [&path] { return recognizeContainer(ByteSource::file(path), path); });
     if (recognized.type == Container::RawStream)
-        return Recording(path).parser().getAvailableMetaDataUUIDs().front();
+        return openRecording(path).streams().front().type;
     if (recognized.type == Container::Unknown)
         throw Failure(fmt::format("{}: not a stream file (.dat): it {}", path, recognized.refusal()));
     throw Failure(
@@ -60,15 +61,15 @@ uuid typeOfStreamFile(const std::string& path) {
 void takeStreamFiles(const AttachOptions& options, Streams& streams) {
     for (const std::string& path : options.streams) {
         const uuid type = typeOfStreamFile(path);
-        if (Recording(path).size() == 0) {
+        if (std::filesystem::file_size(path) == 0) {
             complain(fmt::format("{}: is empty, as nothing was recorded into it; it was left out", path));
             streams.empty.push_back(path);
             streams.code = ExitDamaged;
             continue;
         }
         streams.types.insert(type);
-        streams.sources.push_back(StreamSource::file(path));
-        streams.files.push_back(streams.sources.back());
+        const StreamSource source = StreamSource::file(path);
+        streams.sources.push_back(options.unchecked ? source.unchecked() : source);
     }
 }
 
@@ -78,45 +79,37 @@ void complainAboutOldMovie(const std::string& path, const std::string& what, Str
 }
 
 /// Where the children of a metadata atom or chunk do not end where it does, not all of them were found.
-bool hasUnreachableStreams(Recording& recording) {
-    std::istream& stream = recording.parser().getStream();
-    const Container::Type container = recording.parser().getStreamType();
-    const bool isMovie = container == Container::QuickTime;
-    const std::uint64_t total = recording.size();
-    for (const ContainerItem& item : listTopLevel(stream, container)) {
-        if (item.type != "ZULM")
+bool hasUnreachableStreams(const Recording& recording) {
+    ItemWalk items(recording.bytes(), recording.container());
+    while (const auto item = items.next()) {
+        if (!item->holdsMetaData())
             continue;
-        const auto children = (isMovie ? listAtoms : listChunks)(stream, item.payloadOffset(), item.end(), total);
-        std::uint64_t end = children.empty() ? item.payloadOffset() : children.back().end();
-        if (!isMovie && !children.empty())
-            end += children.back().size % 2;
-        if (end != item.end())
+        std::uint64_t end = item->payloadOffset();
+        ItemWalk children = items.inside(*item);
+        while (const auto child = children.next())
+            end = children.after(*child);
+        if (end != item->end())
             return true;
     }
     return false;
 }
 
 void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
-    Recording old(options.from);
-    MetaDataParser& parser = old.parser();
-    for (const uuid& type : parser.getAvailableMetaDataUUIDs()) {
-        if (options.replace && streams.types.contains(type))
+    const Recording old = openRecording(options.from);
+    for (const StreamInfo& stream : old.streams()) {
+        if (options.replace && streams.types.contains(stream.type))
             continue; // a stream file takes its place
-        const auto [offset, length] = parser.fileDataForUUID(type);
-        const std::uint64_t total = old.size();
-        if (length < s_metaDataHeaderSize || length >= s_negativeLength) {
-            complainAboutOldMovie(
-                options.from,
-                fmt::format("{} at offset {} lies in an atom without room for it", metaDataKindName(type), offset),
-                streams);
+        const std::string place = fmt::format("{} at offset {}", stream.name(), stream.offset);
+        if (stream.declaredBytes < s_metaDataHeaderSize || stream.declaredBytes >= s_negativeLength) {
+            complainAboutOldMovie(options.from, place + " lies in an atom without room for it", streams);
             continue;
         }
-        if (length > total - offset)
+        if (stream.isCutShort())
             complainAboutOldMovie(options.from,
-                                  fmt::format("{} at offset {} declares {} bytes, {} of which are there",
-                                              metaDataKindName(type), offset, length, total - offset),
+                                  fmt::format("{} declares {} bytes, {} of which are there", place,
+                                              stream.declaredBytes, stream.presentBytes),
                                   streams);
-        streams.sources.push_back(StreamSource::part(options.from, offset, length));
+        streams.sources.push_back(StreamSource::part(options.from, stream.offset, stream.declaredBytes).unchecked());
     }
     if (hasUnreachableStreams(old))
         complainAboutOldMovie(options.from, "its metadata cannot be walked to the end", streams);
@@ -144,8 +137,7 @@ void print(const std::string& name, const AttachResult& attached) {
 }
 
 Json streamDocument(const AttachedStream& stream) {
-    const MetaDataKind* kind = findMetaDataKind(stream.type);
-    Json document{{"source", stream.name},         {"kind", kind ? Json(kind->name) : Json(nullptr)},
+    Json document{{"source", stream.name},         {"kind", kindDocument(stream.type)},
                   {"uuid", uuidText(stream.type)}, {"offset", stream.offset},
                   {"bytes", stream.bytes},         {"entries", stream.entries},
                   {"bytes_cut", stream.bytesCut}};
@@ -212,18 +204,18 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     const RetimedSources retimed(streams.sources, options.times, duration, folder);
     if (retimed.sources().empty())
         return complainAboutNoStreams(options, ExitDamaged);
-    const auto existing = options.replace ? SafeMovieSave::Existing::Supersede : SafeMovieSave::Existing::Refuse;
-    using Sources = SafeMovieSave::Sources;
+    const auto existing = options.replace ? ExistingStreams::Supersede : ExistingStreams::Refuse;
     const auto index =
         options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd : SafeMovieSave::FragmentIndex::Leave;
-    movie.examine([&](const SafeMovieSave& save) {
-        if (!streams.files.empty() && !options.unchecked)
-            save.checkAttach(streams.files, existing);
-        save.checkAttach(retimed.sources(), existing, Sources::Unchecked);
+    const AttachPlan plan = movie.examine([&](const std::string& path) {
+        AttachPlan examined(streams.sources, existing);
+        if (options.times.changesTimes())
+            examined = AttachPlan(retimed.sources(), existing);
+        orFileError(path, [&] { examined.requireFor(ByteSource::file(path), path); });
+        return examined;
     });
-    const AttachResult attached = movie.save("attaching to " + movie.name(), [&](const SafeMovieSave& save) {
-        return save.attach(retimed.sources(), existing, Sources::Unchecked, index);
-    });
+    const AttachResult attached =
+        movie.save("attaching to " + movie.name(), [&](const SafeMovieSave& save) { return save.attach(plan, index); });
     const TimesOutside times{warnOfTimesOutside(movie.name(), duration, retimed.sources()), retimed.entriesRemoved()};
     if (report.isWanted())
         report.add(fileDocument(options, movie.name(), attached, times, streams));

@@ -2,9 +2,9 @@
 
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/OutputFile.h"
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/TemporaryFile.h"
 #include "ZULMetaData/Containers/MovieDuration.h"
+#include "ZULMetaDataBridge/Source/FileError.h"
 
 #include <fmt/core.h>
 
@@ -25,7 +25,7 @@ constexpr double s_tolerance = 0.01;
 /// Appends a stream's copy. Returns nothing for one that is no stream.
 std::optional<RetimedStream> appendTo(std::ostream& output, const StreamSource& source, const Retiming& retiming) {
     const RetimedStream stream =
-        orUnreadable(source.name(), [&] { return retimeStream(source.open(), retiming, output); });
+        orFileError(source.name(), [&] { return retimeStream(source.open(), retiming, output); });
     if (stream.isReadable)
         return stream;
     if (stream.header.uuid == MetaDataHeader().uuid)
@@ -64,6 +64,7 @@ RetimedSources::RetimedSources(const std::vector<StreamSource>& originals, const
             sources_.push_back(original); // refused in the words of everyone who attaches it
             continue;
         }
+        output.flush(); // so that the copy can be opened
         entriesRemoved_ += stream->entriesRemoved;
         if (stream->bytesLeftOut > 0)
             cuts_.push_back(fmt::format("{}: {} left out {} bytes after its last whole entry", original.name(),
@@ -72,7 +73,8 @@ RetimedSources::RetimedSources(const std::vector<StreamSource>& originals, const
             warn(fmt::format("{}: no entry of {} lies in the movie; the stream is left out", original.name(),
                              metaDataKindName(stream->header.uuid)));
         else
-            sources_.push_back(StreamSource::part(file_->path(), begin, size).named(original.name()));
+            sources_.push_back(
+                StreamSource::bytes(ByteSource::file(file_->path()).part(begin, size), original.name()).unchecked());
     }
     output.close();
     if (!output)
@@ -88,10 +90,7 @@ ExitCode RetimedSources::complainAboutCuts() const {
 }
 
 std::optional<double> durationOfMovie(const std::string& path) {
-    std::ifstream movie = openInput(path);
-    const auto duration = movieDuration(movie, Container::QuickTime);
-    requireRead(movie, path);
-    return duration;
+    return orFileError(path, [&path] { return movieDuration(ByteSource::file(path), Container::QuickTime); });
 }
 
 std::uint64_t warnOfTimesOutside(const std::string& name, std::optional<double> duration,
@@ -102,7 +101,7 @@ std::uint64_t warnOfTimesOutside(const std::string& name, std::optional<double> 
     double first = 0;
     double last = 0;
     for (const StreamSource& source : sources) {
-        const TimeSpan span = orUnreadable(source.name(), [&] { return timeSpanOf(source.open(), end + s_tolerance); });
+        const TimeSpan span = orFileError(source.name(), [&] { return timeSpanOf(source.open(), end + s_tolerance); });
         after += span.entriesAfter;
         streams += span.entriesAfter > 0 ? 1U : 0U;
         first = std::min(first, span.first.value_or(0));

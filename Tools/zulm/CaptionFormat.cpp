@@ -1,6 +1,6 @@
 #include "Tools/zulm/CaptionFormat.h"
 
-#include "Tools/zulm/Text.h"
+#include "Reports/Text.h"
 
 #include <fmt/core.h>
 

@@ -2,7 +2,7 @@
 
 // Option values that are names out of a short list, and the help for names that are not.
 
-#include "Tools/zulm/Number.h"
+#include "Reports/Number.h"
 
 #include <CLI/CLI.hpp>
 #include <fmt/core.h>

@@ -1,9 +1,10 @@
 #include "Tools/zulm/Command.h"
 
+#include "Reports/Text.h"
 #include "SharedDependencies/EndianFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
-#include "Tools/zulm/Text.h"
+#include "ZULMetaDataBridge/Source/FileError.h"
 
 #include <fmt/color.h>
 #include <fmt/core.h>
@@ -69,6 +70,8 @@ ExitCode orComplaint(const Action& work) {
         complain("out of memory");
     } catch (const std::filesystem::filesystem_error& error) {
         complain(fmt::format("{}: {}", error.path1().string(), error.code().message()));
+    } catch (const ZULMetaData::FileError& error) {
+        complain(error.what());
     } catch (const std::system_error&) {
         throw;
     } catch (const std::exception& error) {

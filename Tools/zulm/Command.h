@@ -56,8 +56,8 @@ void say(const std::string& message);
 /// The worse of two ends, for a command that works on several files.
 ExitCode worseOf(ExitCode left, ExitCode right);
 
-/// Runs `work`. A `Failure` or another exception becomes a complaint and `ExitFailed`. Throws only `std::system_error`,
-/// which standard output throws if it cannot be written.
+/// Runs `work`. A `Failure` or another exception becomes a complaint and `ExitFailed`. Throws only a
+/// `std::system_error` that names no file, which standard output throws if it cannot be written.
 ExitCode orComplaint(const Action& work);
 
 /// Runs `work` on one file after the other, whatever happens to the ones before. A `Failure` becomes a complaint.

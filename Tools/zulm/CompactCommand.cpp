@@ -1,6 +1,8 @@
 // The commands that write a recording anew with less metadata: compact and detach.
 
 #include "Platform/DurableFile.h"
+#include "Reports/Text.h"
+#include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/MetaDataTail.h"
@@ -9,7 +11,6 @@
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -54,8 +55,8 @@ std::unique_ptr<OutputFile> outputFor(const TailOptions& options) {
                                         options.save.force);
 }
 
-Json streamDocument(const HeldStream& stream) {
-    return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}, {"bytes", stream.present}};
+Json streamDocument(const StreamInfo& stream) {
+    return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}, {"bytes", stream.presentBytes}};
 }
 
 Json fileDocument(const TailOptions& options, const MetaDataTail& tail) {
@@ -66,7 +67,7 @@ Json fileDocument(const TailOptions& options, const MetaDataTail& tail) {
                      {"streams_left_out", tail.streamsLeftOut()},
                      {"creators_left_out", tail.creatorsLeftOut()},
                      {"streams", Json::array()}});
-    for (const HeldStream& stream : tail.streams())
+    for (const StreamInfo& stream : tail.streams())
         file["streams"].push_back(streamDocument(stream));
     return file;
 }
@@ -80,9 +81,9 @@ void print(const TailOptions& options, const MetaDataTail& tail) {
 ExitCode writeTail(const TailOptions& options, RunReport& report) {
     const std::optional<DurableFile> lock = lockOf(options);
     const InputFile input(options.save.movie);
-    Recording recording(input.path(), input.name());
+    Recording recording = input.open();
     if (!options.save.inPlace)
-        requireOutputName(options.save.output, recording.parser().getStreamType(), input.path());
+        requireOutputName(options.save.output, recording.container(), input.path());
     MetaDataTail tail(recording, options.kept);
     const std::uint64_t streams = tail.streams().size() + tail.streamsLeftOut();
     if (streams == 0 && tail.creatorsLeftOut() == 0)

@@ -1,10 +1,11 @@
+#include "Reports/Text.h"
 #include "Tools/zulm/CaptionFormat.h"
 #include "Tools/zulm/Choice.h"
-#include "Tools/zulm/HeldStreams.h"
+#include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
+#include "ZULMetaDataBridge/Source/KeyCaptions.h"
 
 #include <fmt/core.h>
 
@@ -39,7 +40,7 @@ public:
     CaptionReader(const ConvertOptions& options, Recording& recording, std::optional<double> duration)
         : options_(options), recording_(recording), end_(endOfCaptions(duration)) {}
 
-    void read(const HeldStream& stream) {
+    void read(const StreamInfo& stream) {
         RecordedKinds::visit(stream.type, [&]<class Kind>() { readKind<Kind>(stream); });
     }
 
@@ -48,7 +49,7 @@ public:
 
 private:
     template <class Kind>
-    void readKind(const HeldStream& stream) {
+    void readKind(const StreamInfo& stream) {
         if constexpr (std::same_as<typename Kind::Value, KeyStroke>) {
             std::vector<KeyEvent> keys;
             walk<KeyStroke>(stream, [&](double time, const KeyStroke& key) { keys.push_back({time, key}); });
@@ -79,37 +80,29 @@ private:
     };
 
     template <class Value, class Visit>
-    void walk(const HeldStream& stream, Visit visit) {
-        StreamEntries entries = entriesOf(recording_, stream);
-        std::uint64_t end = 0;
+    void walk(const StreamInfo& stream, Visit visit) {
         LeftOut leftOut;
-        if (entries.header() && isDecodable(*entries.header())) {
-            end = entries.wholeBytes();
-            while (const auto entry = entries.next()) {
-                const auto decoded = decodeEntry<Value>(entries.bytesOf(*entry), entries.header()->version);
-                if (!decoded)
-                    break;
-                end = entry->end();
-                if (decoded->time >= 0 && decoded->time < end_)
-                    visit(decoded->time, decoded->value);
-                else
-                    ++(decoded->time >= end_ ? leftOut.atEnd : leftOut.beforeStart);
-            }
-        }
+        const std::uint64_t end = recording_.readEntries<Value>(stream, [&](double time, const Value& value) {
+            if (time >= 0 && time < end_)
+                visit(time, value);
+            else
+                ++(time >= end_ ? leftOut.atEnd : leftOut.beforeStart);
+            return true;
+        });
         complainAbout(stream, end, leftOut);
     }
 
-    void complainAbout(const HeldStream& stream, std::uint64_t end, const LeftOut& leftOut) {
+    void complainAbout(const StreamInfo& stream, std::uint64_t end, const LeftOut& leftOut) {
         complainAbout(stream, leftOut.beforeStart, "before the beginning or at no time");
         complainAbout(stream, leftOut.atEnd, fmt::format("at the end, {} s, or after it", end_));
-        if (end < stream.declared)
+        if (end < stream.declaredBytes)
             complain(fmt::format("{}: {} cannot be read from offset {} on; 'zulm verify {}' says more",
                                  recording_.name(), stream.name(), stream.offset + end, shellWord(recording_.name())));
-        if (end < stream.declared)
+        if (end < stream.declaredBytes)
             code_ = ExitDamaged;
     }
 
-    void complainAbout(const HeldStream& stream, std::uint64_t leftOut, const std::string& where) {
+    void complainAbout(const StreamInfo& stream, std::uint64_t leftOut, const std::string& where) {
         if (leftOut == 0)
             return;
         complain(fmt::format("{}: {}: left out {} {} {}", recording_.name(), stream.name(), leftOut,
@@ -133,21 +126,20 @@ std::vector<std::string> kindsFor(const ConvertOptions& options) {
 
 /// Returns nothing for a movie that tells no length, as one that was never finished.
 std::optional<double> lengthOf(Recording& recording) {
-    const std::optional<double> duration = movieDuration(recording.parser());
-    requireRead(recording.parser().getStream(), recording.name());
+    const std::optional<double> duration = recording.duration();
     return duration && *duration > 0 ? duration : std::nullopt;
 }
 
 ExitCode runConvert(const ConvertOptions& options) {
     const InputFile input(options.file);
-    Recording recording(input.path(), input.name());
+    Recording recording = input.open();
     const std::vector<std::string> kinds = kindsFor(options);
-    const std::vector<HeldStream> streams = heldStreams(recording, kinds);
+    const std::vector<StreamInfo> streams = chosenStreams(recording, kinds);
     if (streams.empty())
         return complainAboutNothing(recording, kinds);
     const std::optional<double> duration = lengthOf(recording);
     CaptionReader reader(options, recording, duration);
-    for (const HeldStream& stream : streams)
+    for (const StreamInfo& stream : streams)
         reader.read(stream);
     const std::string text =
         formatted(placed(reader.captions(), unitsPerSecond(options.format), duration), options.format);

@@ -1,11 +1,11 @@
+#include "Reports/EntryFormat.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/Choice.h"
-#include "Tools/zulm/EntryFormat.h"
-#include "Tools/zulm/HeldStreams.h"
+#include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -68,8 +68,8 @@ Json documentOf(const MetaDataHeader& header, const std::string& bytes) {
 /// One of the two streams, with the entry that comes next.
 class Side {
 public:
-    Side(Recording& recording, const HeldStream& stream)
-        : recording_(recording), stream_(stream), entries_(entriesOf(recording, stream)) {
+    Side(Recording& recording, const StreamInfo& stream)
+        : recording_(recording), stream_(stream), entries_(recording.entriesOf(stream)) {
         advance();
     }
 
@@ -93,7 +93,7 @@ public:
     }
 
     /// The number of bytes after the last entry that could be compared.
-    std::uint64_t rest() const { return stream_.declared - end_; }
+    std::uint64_t rest() const { return stream_.declaredBytes - end_; }
 
     ExitCode complainAboutRest() const {
         if (rest() == 0)
@@ -105,7 +105,7 @@ public:
 
 private:
     Recording& recording_;
-    HeldStream stream_;
+    StreamInfo stream_;
     StreamEntries entries_;
     std::optional<StreamEntry> current_;
     std::string bytes_;
@@ -113,18 +113,14 @@ private:
     std::uint64_t end_ = 0;
 };
 
-bool haveSameBytes(Recording& left, const HeldStream& leftStream, Recording& right, const HeldStream& rightStream) {
-    if (leftStream.present != rightStream.present || leftStream.declared != rightStream.declared)
+bool haveSameBytes(const ByteSource& left, const ByteSource& right) {
+    if (left.size() != right.size())
         return false;
     std::vector<char> leftPiece(1 << 18);
     std::vector<char> rightPiece(leftPiece.size());
-    const ReadBytes readLeft = left.bytes();
-    const ReadBytes readRight = right.bytes();
-    for (std::uint64_t done = 0; done < leftStream.present;) {
-        const auto wanted =
-            static_cast<std::size_t>(std::min<std::uint64_t>(leftPiece.size(), leftStream.present - done));
-        const std::size_t size = readLeft(leftStream.offset + done, {leftPiece.data(), wanted});
-        if (size == 0 || readRight(rightStream.offset + done, {rightPiece.data(), size}) != size ||
+    for (std::uint64_t done = 0; done < left.size();) {
+        const std::size_t size = left.read(done, leftPiece);
+        if (size == 0 || right.read(done, {rightPiece.data(), size}) != size ||
             !std::equal(leftPiece.begin(), leftPiece.begin() + static_cast<std::ptrdiff_t>(size), rightPiece.begin()))
             return false;
         done += size;
@@ -264,7 +260,7 @@ public:
         : options_(options), left_(left), right_(right), writer_(writer) {}
 
     /// The streams of both sides, merged in the order of their identifiers.
-    void run(const std::vector<HeldStream>& left, const std::vector<HeldStream>& right) {
+    void run(const std::vector<StreamInfo>& left, const std::vector<StreamInfo>& right) {
         auto l = left.begin();
         auto r = right.begin();
         while (l != left.end() || r != right.end()) {
@@ -280,17 +276,17 @@ public:
     ExitCode code() const { return code_; }
 
 private:
-    static Json streamHeader(const HeldStream& stream) {
+    static Json streamHeader(const StreamInfo& stream) {
         return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}};
     }
 
-    static Json streamDocument(const HeldStream& stream, const char* status) {
+    static Json streamDocument(const StreamInfo& stream, const char* status) {
         Json document = streamHeader(stream);
         document["status"] = status;
         return document;
     }
 
-    void addOneSided(const HeldStream& stream, const std::string& file, const char* status) {
+    void addOneSided(const StreamInfo& stream, const std::string& file, const char* status) {
         code_ = ExitDamaged;
         if (writer_)
             writer_->element(streamDocument(stream, status));
@@ -298,14 +294,15 @@ private:
             writeOutput(fmt::format("{}: only in {}\n", stream.name(), shown(file)));
     }
 
-    void compare(const HeldStream& leftStream, const HeldStream& rightStream) {
-        if (!haveSameBytes(left_, leftStream, right_, rightStream))
+    void compare(const StreamInfo& leftStream, const StreamInfo& rightStream) {
+        if (leftStream.declaredBytes != rightStream.declaredBytes ||
+            !haveSameBytes(left_.bytesOf(leftStream), right_.bytesOf(rightStream)))
             compareEntries(leftStream, rightStream);
         else if (writer_)
             writer_->element(streamDocument(leftStream, "same"));
     }
 
-    void compareEntries(const HeldStream& leftStream, const HeldStream& rightStream) {
+    void compareEntries(const StreamInfo& leftStream, const StreamInfo& rightStream) {
         Side left(left_, leftStream);
         Side right(right_, rightStream);
         Heading heading(leftStream.name());
@@ -365,10 +362,10 @@ private:
 ExitCode diff(const DiffOptions& options, RunReport& report) {
     const InputFile leftFile(options.left);
     const InputFile rightFile(options.right);
-    Recording left(leftFile.path(), leftFile.name());
-    Recording right(rightFile.path(), rightFile.name());
-    const auto leftStreams = heldStreams(left, options.kinds);
-    const auto rightStreams = heldStreams(right, options.kinds);
+    Recording left = leftFile.open();
+    Recording right = rightFile.open();
+    const auto leftStreams = chosenStreams(left, options.kinds);
+    const auto rightStreams = chosenStreams(right, options.kinds);
     if (leftStreams.empty() && rightStreams.empty())
         return worseOf(complainAboutNothing(left, options.kinds), complainAboutNothing(right, options.kinds));
     JsonWriter* const writer = report.isWanted() ? &report.writer() : nullptr;

@@ -1,16 +1,17 @@
+#include "Reports/EntryFormat.h"
+#include "Reports/Findings.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/Choice.h"
+#include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/Command.h"
-#include "Tools/zulm/EntryFormat.h"
-#include "Tools/zulm/HeldStreams.h"
+#include "Tools/zulm/FileAccess.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Printout.h"
 #include "Tools/zulm/Progress.h"
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -41,40 +42,31 @@ struct DumpOptions {
 
 /// Prints the entries of one stream as they are read.
 template <class Kind>
-class EntryPrinter final : public DataStreamObserver<typename Kind::Value> {
+class EntryPrinter {
 public:
-    EntryPrinter(const DumpOptions& options, Recording& recording, Printout& printout, const StreamInfo& stream)
+    EntryPrinter(const DumpOptions& options, Recording& recording, Printout& printout, const StreamReport& stream)
         : options_(options), recording_(recording), printout_(printout), stream_(stream) {
         if (!isTerminal(stdout))
-            progress_.emplace("reading " + stream.kind, stream.range.length);
+            progress_.emplace("reading " + stream.name(), stream.readableBytes);
     }
 
-    bool dataRead(double time, const typename Kind::Value& value) override {
+    void print(double time, const typename Kind::Value& value) {
         ++read_;
-        showProgress();
+        if (progress_ && read_ % 1024 == 0)
+            progress_->moveTo(stream_.readableBytes * read_ / std::max(read_, stream_.wholeEntries));
         if (!options_.covers(time))
-            return true;
+            return;
         Json entry = entryDocument<Kind>(time, value);
         if (const std::string damage = damageOf(entry); !damage.empty() && !options_.imageFolder.empty())
-            warn(fmt::format("{}: {}, entry {}: {}; not written", recording_.name(), stream_.kind, read_, damage));
+            warn(fmt::format("{}: {}, entry {}: {}; not written", recording_.name(), stream_.name(), read_, damage));
         if constexpr (std::same_as<typename Kind::Value, CursorImage>)
             writeImage(entry, value);
         printout_.print(entry);
-        return true;
     }
 
     std::uint64_t read() const { return read_; }
 
 private:
-    /// Asking a file for its position costs a call of the system.
-    void showProgress() {
-        constexpr std::uint64_t interval = 1024;
-        if (!progress_ || read_ % interval != 0)
-            return;
-        const auto position = static_cast<std::uint64_t>(recording_.parser().getStream().tellg());
-        progress_->moveTo(std::min(position - stream_.range.offset, stream_.range.length));
-    }
-
     void writeImage(Json& entry, const CursorImage& cursor) const {
         if (options_.imageFolder.empty() || !entry["image"].is_object() || !damageOf(entry).empty())
             return;
@@ -92,76 +84,82 @@ private:
     const DumpOptions& options_;
     Recording& recording_;
     Printout& printout_;
-    const StreamInfo& stream_;
+    const StreamReport& stream_;
     std::optional<Progress> progress_;
     std::uint64_t read_ = 0;
 };
 
 template <class Kind>
-ExitCode dumpEntries(Recording& recording, const DumpOptions& options, Printout& printout, const StreamInfo& stream) {
+void dumpEntries(Recording& recording, const DumpOptions& options, Printout& printout, const StreamReport& stream) {
     EntryPrinter<Kind> printer(options, recording, printout, stream);
-    recording.readEntries<typename Kind::Value>(stream, printer);
-    if (!stream.damage.empty())
-        warn(fmt::format("{}: {} {}; 'zulm verify {}' says more", recording.name(), stream.kind, stream.damage,
+    recording.readEntries<typename Kind::Value>(stream, [&printer](double time, const typename Kind::Value& value) {
+        printer.print(time, value);
+        return true;
+    });
+    if (const std::string damage = damageIn(stream); !damage.empty())
+        warn(fmt::format("{}: {} {}; 'zulm verify {}' says more", recording.name(), stream.name(), damage,
                          shellWord(recording.name())));
-    say(fmt::format("{}: {} entries of {} read", recording.name(), printer.read(), stream.kind));
-    return stream.damage.empty() ? ExitFine : ExitDamaged;
+    say(fmt::format("{}: {} entries of {} read", recording.name(), printer.read(), stream.name()));
 }
 
-ExitCode dumpStream(Recording& recording, const DumpOptions& options, Printout& printout, const StreamInfo& stream,
+ExitCode dumpStream(Recording& recording, const DumpOptions& options, Printout& printout, const StreamReport& stream,
                     bool isOnlyOne) {
-    ExitCode code = ExitFine;
+    const std::string damage = damageIn(stream);
     bool isShown = true;
     const bool isDecoded =
-        stream.isDecodable && RecordedKinds::visit(stream.type, [&]<class Kind>() {
+        isDecodable(stream.header()) && RecordedKinds::visit(stream.type, [&]<class Kind>() {
             const EntryKeys keys = tableKeys<Kind>();
             isShown = options.columns.areIn(keys);
             if (!isShown)
-                return say(fmt::format("{}: {} has none of the columns", recording.name(), stream.kind));
+                return say(fmt::format("{}: {} has none of the columns", recording.name(), stream.name()));
             printout.beginStream(stream, &keys, isOnlyOne);
-            code = dumpEntries<Kind>(recording, options, printout, stream);
+            dumpEntries<Kind>(recording, options, printout, stream);
         });
     if (!isShown)
-        return code;
+        return ExitFine;
     if (!isDecoded) {
         printout.beginStream(stream, nullptr, isOnlyOne);
-        warn(fmt::format("{}: entries of {}, version {}, cannot be decoded{}", recording.name(),
-                         metaDataKindName(stream.type), stream.version,
-                         stream.damage.empty() ? std::string() : ": " + stream.damage));
-        code = stream.damage.empty() ? ExitFine : ExitDamaged;
+        warn(fmt::format("{}: entries of {}, version {}, cannot be decoded{}", recording.name(), stream.name(),
+                         stream.version, damage.empty() ? damage : ": " + damage));
     }
     printout.endStream();
-    return code;
+    return damage.empty() ? ExitFine : ExitDamaged;
 }
 
-struct Choice {
-    std::vector<uuid> types;
-    std::vector<std::string> missing;
+struct StreamsToDump {
+    std::vector<StreamInfo> streams;
+    std::vector<std::string> missing; ///< names that no stream has
 };
 
-Choice chosenTypes(const std::vector<uuid>& available, const DumpOptions& options) {
-    if (options.kinds.empty())
+/// In the order in which they are named.
+StreamsToDump streamsToDump(const std::vector<StreamInfo>& available, const DumpOptions& options) {
+    if (available.empty() || options.kinds.empty())
         return {available, {}};
-    Choice choice;
+    StreamsToDump chosen;
+    const auto find = [](const std::vector<StreamInfo>& streams, const uuid& type) {
+        return std::find_if(streams.begin(), streams.end(), [&](const auto& stream) { return stream.type == type; });
+    };
     for (const std::string& name : options.kinds) {
         const uuid type = typeNamed(name);
-        if (std::find(available.begin(), available.end(), type) == available.end())
-            choice.missing.push_back(name);
-        else if (std::find(choice.types.begin(), choice.types.end(), type) == choice.types.end())
-            choice.types.push_back(type);
+        const auto stream = find(available, type);
+        if (stream == available.end())
+            chosen.missing.push_back(name);
+        else if (find(chosen.streams, type) == chosen.streams.end())
+            chosen.streams.push_back(*stream);
     }
-    return choice;
+    return chosen;
 }
 
 ExitCode dumpFile(const std::string& path, const DumpOptions& options, Printout& printout) {
     const InputFile input(path);
-    Recording recording(input.path(), input.name());
-    const std::vector<uuid> available = recording.parser().getAvailableMetaDataUUIDs();
-    const auto [types, missing] = available.empty() ? Choice() : chosenTypes(available, options);
+    Recording recording = input.open();
+    const std::vector<StreamInfo> available = recording.streams();
+    const auto [streams, missing] = streamsToDump(available, options);
     printout.beginFile(recording);
     ExitCode worst = ExitFine;
-    for (const uuid& type : types)
-        worst = worseOf(worst, dumpStream(recording, options, printout, recording.streamInfo(type), types.size() == 1));
+    for (const StreamInfo& stream : streams)
+        worst =
+            worseOf(worst, dumpStream(recording, options, printout, recording.examine(stream), streams.size() == 1));
     printout.endFile();
     if (available.empty() || !missing.empty())
         worst = worseOf(worst, complainAboutNothing(recording, missing));

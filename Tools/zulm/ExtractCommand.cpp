@@ -1,10 +1,11 @@
-#include "Tools/zulm/HeldStreams.h"
+#include "Reports/Text.h"
+#include "Tools/zulm/ChosenStreams.h"
+#include "Tools/zulm/FileAccess.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 
@@ -25,12 +26,13 @@ struct ExtractOptions {
     bool json = false;
 };
 
-ExitCode complainAboutCut(const std::string& file, const HeldStream& stream) {
+ExitCode complainAboutCut(const std::string& file, const StreamInfo& stream) {
     if (!stream.isCutShort())
         return ExitFine;
     complain(fmt::format("{}: {} at offset {} declares {} bytes, of which {} are there; 'zulm salvage {} -o DIR' may "
                          "find more",
-                         file, stream.name(), stream.offset, stream.declared, stream.present, shellWord(file)));
+                         file, stream.name(), stream.offset, stream.declaredBytes, stream.presentBytes,
+                         shellWord(file)));
     return ExitDamaged;
 }
 
@@ -40,28 +42,28 @@ void beginFile(JsonWriter& writer, const std::string& name) {
     writer.beginArray("streams");
 }
 
-Json streamDocument(const HeldStream& stream, const std::string& output) {
+Json streamDocument(const StreamInfo& stream, const std::string& output) {
     Json document{{"kind", kindDocument(stream.type)},
                   {"uuid", uuidText(stream.type)},
                   {"offset", stream.offset},
-                  {"bytes", stream.present},
-                  {"declared_bytes", stream.declared}};
+                  {"bytes", stream.presentBytes},
+                  {"declared_bytes", stream.declaredBytes}};
     addText(document, "file", output);
     return document;
 }
 
-std::vector<std::string> outputsFor(const std::vector<HeldStream>& streams, const std::string& folder) {
+std::vector<std::string> outputsFor(const std::vector<StreamInfo>& streams, const std::string& folder) {
     std::vector<std::string> outputs;
     outputs.reserve(streams.size());
-    for (const HeldStream& stream : streams)
+    for (const StreamInfo& stream : streams)
         outputs.push_back(streamFileIn(folder, stream.type));
     return outputs;
 }
 
 ExitCode extract(const ExtractOptions& options, RunReport& report) {
     const InputFile input(options.file);
-    Recording recording(input.path(), input.name());
-    const std::vector<HeldStream> streams = heldStreams(recording, options.kinds);
+    Recording recording = input.open();
+    const std::vector<StreamInfo> streams = chosenStreams(recording, options.kinds);
     if (streams.empty())
         return complainAboutNothing(recording, options.kinds);
     createFolder(options.folder);
@@ -71,12 +73,12 @@ ExitCode extract(const ExtractOptions& options, RunReport& report) {
         beginFile(report.writer(), input.name());
     ExitCode worst = ExitFine;
     for (std::size_t i = 0; i < streams.size(); ++i) {
-        writePart(input, streams[i].offset, streams[i].present, outputs[i], options.force);
+        writePart(input, streams[i].offset, streams[i].presentBytes, outputs[i], options.force);
         worst = worseOf(worst, complainAboutCut(input.name(), streams[i]));
         if (report.isWanted())
             report.writer().element(streamDocument(streams[i], outputs[i]));
         else if (!settings().quiet)
-            writeOutput(fmt::format("{}: {} bytes\n", shown(outputs[i]), streams[i].present));
+            writeOutput(fmt::format("{}: {} bytes\n", shown(outputs[i]), streams[i].presentBytes));
     }
     return worst;
 }

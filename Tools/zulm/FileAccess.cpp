@@ -1,6 +1,12 @@
 #include "Tools/zulm/FileAccess.h"
 
+#include "Tools/zulm/Failure.h"
+
+#include <fmt/core.h>
+
+#include <filesystem>
 #include <optional>
+#include <system_error>
 #include <unistd.h>
 
 namespace Zulm {
@@ -72,6 +78,21 @@ bool isInput(const std::string& path, const std::string& input) {
     const auto output = statusOf(path);
     const auto status = statusOfInput(input);
     return output && status && output->st_dev == status->st_dev && output->st_ino == status->st_ino;
+}
+
+void createFolder(const std::string& folder) {
+    std::error_code error;
+    std::filesystem::create_directories(folder, error);
+    if (error)
+        throw Failure(fmt::format("{}: cannot be created: {}", folder, error.message()));
+    if (!std::filesystem::is_directory(folder, error))
+        throw Failure(error ? fmt::format("{}: {}", folder, error.message()) : fmt::format("{}: is no folder", folder));
+}
+
+void requireFree(const std::vector<std::string>& outputs, bool force) {
+    for (const std::string& output : outputs)
+        if (!force && std::filesystem::exists(output))
+            throw Failure(fmt::format("{}: exists already; --force replaces it", output));
 }
 
 } // namespace Zulm

@@ -1,6 +1,6 @@
 #pragma once
 
-// Who may read an output: nobody who may not read all of its inputs.
+// Where outputs go, and who may read them: nobody who may not read all of their inputs.
 
 #include <string>
 #include <sys/stat.h>
@@ -27,5 +27,11 @@ private:
 
 /// Whether the input is the file at `path`, whatever both are called. The input "-" is standard input.
 bool isInput(const std::string& path, const std::string& input);
+
+/// Creates a folder where there is none. Throws `Failure`.
+void createFolder(const std::string& folder);
+
+/// Throws `Failure` where one of the outputs exists, so that nothing is done by halves.
+void requireFree(const std::vector<std::string>& outputs, bool force);
 
 } // namespace Zulm

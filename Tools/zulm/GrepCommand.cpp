@@ -1,9 +1,9 @@
-#include "Tools/zulm/HeldStreams.h"
+#include "Reports/Text.h"
+#include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 #include "Tools/zulm/TextPattern.h"
 
 #include <fmt/core.h>
@@ -47,14 +47,13 @@ constexpr bool holdsTexts = OneOf<typename Kind::Value, std::string, std::list<s
 class Search {
 public:
     Search(const GrepOptions& options, const TextPattern& pattern, const std::string& file, RunReport& report)
-        : options_(options), pattern_(pattern), input_(file), recording_(input_.path(), input_.name()),
-          report_(report) {}
+        : options_(options), pattern_(pattern), input_(file), recording_(input_.open()), report_(report) {}
 
     /// 0 where something matched, 4 where nothing did, 3 where not everything could be searched.
     ExitCode run() {
         if (report_.isWanted())
             beginFile(report_.writer());
-        for (const HeldStream& stream : heldStreams(recording_, options_.kinds))
+        for (const StreamInfo& stream : chosenStreams(recording_, options_.kinds))
             RecordedKinds::visit(stream.type, [&]<class Kind>() {
                 if constexpr (holdsTexts<Kind>)
                     search<typename Kind::Value>(stream);
@@ -73,12 +72,12 @@ private:
     }
 
     template <class Value>
-    void search(const HeldStream& stream) {
-        StreamEntries entries = entriesOf(recording_, stream);
+    void search(const StreamInfo& stream) {
+        StreamEntries entries = recording_.entriesOf(stream);
         std::uint64_t end = 0;
         if (entries.header() && isDecodable(*entries.header()))
             end = searchEntries<Value>(stream, entries);
-        if (end == stream.declared || isDone())
+        if (end == stream.declaredBytes || isDone())
             return;
         isDamaged_ = true;
         complain(fmt::format("{}: {} cannot be searched from offset {} on; 'zulm verify {}' says more", input_.name(),
@@ -87,7 +86,7 @@ private:
 
     /// Returns the number of bytes that were searched.
     template <class Value>
-    std::uint64_t searchEntries(const HeldStream& stream, StreamEntries& entries) {
+    std::uint64_t searchEntries(const StreamInfo& stream, StreamEntries& entries) {
         while (const auto entry = isDone() ? std::nullopt : entries.next()) {
             const auto decoded = decodeEntry<Value>(entries.bytesOf(*entry), entries.header()->version);
             if (!decoded)
@@ -97,17 +96,17 @@ private:
         return entries.wholeBytes();
     }
 
-    void searchTexts(const HeldStream& stream, double time, const std::string& text) {
+    void searchTexts(const StreamInfo& stream, double time, const std::string& text) {
         if (pattern_.matches(validText(text)) != options_.inverts)
             report(stream, time, text);
     }
 
-    void searchTexts(const HeldStream& stream, double time, const std::list<std::string>& texts) {
+    void searchTexts(const StreamInfo& stream, double time, const std::list<std::string>& texts) {
         for (const std::string& text : texts)
             searchTexts(stream, time, utf8FromLatin1(text));
     }
 
-    void report(const HeldStream& stream, double time, const std::string& text) {
+    void report(const StreamInfo& stream, double time, const std::string& text) {
         ++matches_;
         if (report_.isWanted())
             addMatch(stream, time, text);
@@ -118,13 +117,13 @@ private:
             print(stream, time, text);
     }
 
-    void addMatch(const HeldStream& stream, double time, const std::string& text) {
+    void addMatch(const StreamInfo& stream, double time, const std::string& text) {
         Json match{{"stream", stream.name()}, {"timestamp", numberDocument(time)}};
         addText(match, "text", text);
         report_.writer().element(match);
     }
 
-    void print(const HeldStream& stream, double time, const std::string& text) const {
+    void print(const StreamInfo& stream, double time, const std::string& text) const {
         if (!settings().quiet)
             writeOutput(fmt::format("{}:{}:{:.6f}: {}\n", shown(input_.name()), stream.name(), time, shown(text)));
     }

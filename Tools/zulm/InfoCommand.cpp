@@ -1,17 +1,16 @@
+#include "Reports/Findings.h"
+#include "Reports/InfoReport.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/Command.h"
-#include "Tools/zulm/Findings.h"
-#include "Tools/zulm/InfoReport.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/Progress.h"
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <iterator>
 #include <memory>
 
 namespace Zulm {
@@ -25,12 +24,8 @@ struct InfoOptions {
     bool json = false;
 };
 
-bool isDamage(const Finding& finding) {
-    return finding.severity() == Severity::Damage;
-}
-
-ExitCode exitCodeFor(const FileInfo& file) {
-    if (file.isDamaged)
+ExitCode exitCodeFor(const FileInfo& file, const ValidationReport& validation) {
+    if (validation.isDamaged())
         return ExitDamaged;
     return file.streams.empty() ? ExitNoMetaData : ExitFine;
 }
@@ -39,12 +34,13 @@ std::string numberText(const std::optional<double>& number, int digits) {
     return number ? fmt::format("{:.{}f}", *number, digits) : "-";
 }
 
-void printRow(const StreamInfo& stream) {
-    writeOutput(fmt::format("  {:<23}  {:>9}  {:>10}  {:>10}  {:>8}  {:>10}  {:>7}  {}\n",
-                            stream.kind.empty() ? "(unknown)" : stream.kind,
-                            stream.isDecodable ? std::to_string(stream.entries) : "-", numberText(stream.firstTime, 3),
-                            numberText(stream.lastTime, 3), numberText(entriesPerSecond(stream), 2),
-                            stream.range.length, stream.version, uuidText(stream.type)));
+void printRow(const StreamReport& stream) {
+    const MetaDataKind* kind = findMetaDataKind(stream.type);
+    writeOutput(fmt::format(
+        "  {:<23}  {:>9}  {:>10}  {:>10}  {:>8}  {:>10}  {:>7}  {}\n", kind ? kind->name : "(unknown)",
+        isDecodable(stream.header()) ? std::to_string(stream.wholeEntries) : "-", numberText(stream.firstTime, 3),
+        numberText(stream.lastTime, 3), numberText(entriesPerSecond(stream), 2), stream.declaredBytes, stream.version,
+        uuidText(stream.type)));
 }
 
 std::string creatorLine(const CreatorAttributes& creator) {
@@ -55,44 +51,45 @@ std::string creatorLine(const CreatorAttributes& creator) {
 
 void print(Recording& recording, const FileInfo& file) {
     const std::string duration = file.duration ? fmt::format("{:.3f} s", *file.duration) : "duration not told";
-    writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", shown(file.name), file.container, duration,
-                            bytesText(file.bytes), file.streams.size(), file.streams.size() == 1 ? "" : "s"));
+    writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", shown(recording.name()),
+                            containerName(recording.container()), duration, bytesText(recording.size()),
+                            file.streams.size(), file.streams.size() == 1 ? "" : "s"));
     if (!file.streams.empty())
         writeOutput(heading(fmt::format("  {:<23}  {:>9}  {:>10}  {:>10}  {:>8}  {:>10}  {:>7}  {}", "kind", "entries",
                                         "first s", "last s", "per s", "bytes", "version", "uuid")) +
                     '\n');
-    for (const StreamInfo& stream : file.streams)
+    for (const StreamReport& stream : file.streams)
         printRow(stream);
     for (const ZCAPHeader& info : file.creators)
         writeOutput(creatorLine(info.creator));
     visitForeignAtoms(recording, [](const LayoutItem& atom) {
-        writeOutput(fmt::format("  foreign atom: '{}' at offset {}, {} bytes\n", printable(atom.item.type),
+        writeOutput(fmt::format("  foreign atom: '{}' at offset {}, {} bytes\n", printable(atom.item.type.text()),
                                 atom.item.offset, atom.size));
     });
 }
 
 /// Only so many: the rest is for the command that is made for it.
-void warnOf(const FileInfo& file) {
+void warnOf(const std::string& name, const ValidationReport& validation) {
     constexpr std::size_t most = 5;
-    std::vector<Finding> damage;
-    std::copy_if(file.warnings.begin(), file.warnings.end(), std::back_inserter(damage), isDamage);
+    std::vector<Finding> damage = validation.allFindings();
+    std::erase_if(damage, [](const Finding& finding) { return finding.severity() != Severity::Damage; });
     for (std::size_t i = 0; i < std::min(most, damage.size()); ++i)
-        warnAbout(file.name, findingText(damage[i]));
-    if (file.isDamaged)
-        warn(fmt::format("{}: 'zulm verify {}' says {}", file.name, shellWord(file.name),
+        warnAbout(name, findingText(damage[i]));
+    if (validation.isDamaged())
+        warn(fmt::format("{}: 'zulm verify {}' says {}", name, shellWord(name),
                          damage.size() > most ? fmt::format("{} more", damage.size() - most) : "what that means"));
 }
 
 ExitCode showInfo(const std::string& path, RunReport& report) {
     const InputFile input(path);
-    Recording recording(input.path(), input.name());
+    Recording recording = input.open();
     const FileInfo file = inspect(recording);
-    warnOf(file);
+    warnOf(recording.name(), recording.validation());
     if (report.isWanted())
         writeInfo(report.writer(), recording, file);
     else
         print(recording, file);
-    const ExitCode code = exitCodeFor(file);
+    const ExitCode code = exitCodeFor(file, recording.validation());
     if (code == ExitNoMetaData)
         report.note(path, "has no recording metadata");
     return code;

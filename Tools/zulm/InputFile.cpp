@@ -4,6 +4,7 @@
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/TemporaryFile.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
@@ -92,6 +93,10 @@ InputFile::InputFile(const std::string& argument) : name_(argument), path_(argum
 InputFile::~InputFile() = default;
 InputFile::InputFile(InputFile&&) noexcept = default;
 
+ZULMetaData::Recording InputFile::open() const {
+    return openRecording(path_, name_);
+}
+
 void InputFile::spool() {
     std::array<char, 1 << 16> piece;
     std::size_t size = readInput(piece.data(), piece.size());
@@ -102,10 +107,25 @@ void InputFile::spool() {
         throw Failure(fmt::format("{}: standard input {}", name_, recognized.refusal()));
     temporary_ = newSpoolFile(std::string(extension));
     path_ = temporary_->path();
-    const ZULMetaData::Descriptor file(open(path_.c_str(), O_WRONLY | O_CLOEXEC));
+    const ZULMetaData::Descriptor file(::open(path_.c_str(), O_WRONLY | O_CLOEXEC));
     for (; size > 0; size = readInput(piece.data(), piece.size()))
         writeAll(file.number(), piece.data(), size);
     say(fmt::format("{}: standard input is kept in {} meanwhile", name_, path_));
+}
+
+ZULMetaData::Recording openRecording(const std::string& path, const std::string& name) {
+    requireFile(path);
+    ZULMetaData::Recording recording(path, name);
+    const char* container = containerName(recording.container());
+    if (isNamedOtherwise(path, recording.container()))
+        warn(fmt::format("{}: is a {} by its contents, whatever its name says", recording.name(), container));
+    say(fmt::format("{}: {} with {} streams", recording.name(), container, recording.streams().size()));
+    return recording;
+}
+
+bool isNamedOtherwise(const std::string& path, ZULMetaData::Container::Type type) {
+    const auto named = ZULMetaData::MetaDataParser::streamTypeOf(path);
+    return named != ZULMetaData::Container::Unknown && named != type;
 }
 
 } // namespace Zulm

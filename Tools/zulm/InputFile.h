@@ -2,6 +2,8 @@
 
 // A file to read that was named on the command line, where "-" is standard input.
 
+#include "ZULMetaDataBridge/Source/Recording.h"
+
 #include <memory>
 #include <string>
 
@@ -25,6 +27,9 @@ public:
     /// What to call it towards a person or in a report: as it was named.
     const std::string& name() const { return name_; }
 
+    /// Opens it as `openRecording` does. This must outlive the recording.
+    ZULMetaData::Recording open() const;
+
 private:
     void spool();
 
@@ -32,5 +37,12 @@ private:
     std::string path_;
     std::unique_ptr<TemporaryFile> temporary_;
 };
+
+/// Opens a recording, and warns if its name tells another container than its contents do. Throws `Failure` unless it is
+/// a regular file, and what `Recording` throws. Messages call it `name`, or by its path if `name` is empty.
+ZULMetaData::Recording openRecording(const std::string& path, const std::string& name = {});
+
+/// Whether a file's name tells another container than its contents do, so that programs that go by the name fail.
+bool isNamedOtherwise(const std::string& path, ZULMetaData::Container::Type type);
 
 } // namespace Zulm

@@ -1,8 +1,11 @@
 #include "Tools/zulm/MetaDataTail.h"
 
+#include "Reports/Text.h"
+#include "Tools/zulm/Failure.h"
 #include "Tools/zulm/OutputFile.h"
-#include "Tools/zulm/Text.h"
 #include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/RepairPlan.h"
+#include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
 #include <fmt/core.h>
 
@@ -61,15 +64,14 @@ std::uint64_t padded(std::uint64_t size) {
     return size + size % 2;
 }
 
-/// Calls `visit` with every piece of a part of a file.
+/// Calls `visit` with every piece of a source.
 template <class Visit>
-void inPieces(const ReadBytes& read, const std::string& name, std::uint64_t offset, std::uint64_t size, Visit visit) {
-    std::string piece(static_cast<std::size_t>(std::min<std::uint64_t>(size, s_copyPieceSize)), '\0');
-    for (std::uint64_t done = 0; done < size;) {
-        const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(piece.size(), size - done));
-        const std::size_t got = read(offset + done, {piece.data(), wanted});
+void inPieces(const ByteSource& source, const std::string& name, Visit visit) {
+    std::string piece(static_cast<std::size_t>(std::min<std::uint64_t>(source.size(), s_copyPieceSize)), '\0');
+    for (std::uint64_t done = 0; done < source.size();) {
+        const std::size_t got = source.read(done, piece);
         if (got == 0)
-            throw Failure(fmt::format("{}: cannot be read at offset {}", name, offset + done));
+            throw Failure(fmt::format("{}: ends earlier than before", name));
         visit(std::string_view(piece.data(), got));
         done += got;
     }
@@ -79,29 +81,26 @@ void inPieces(const ReadBytes& read, const std::string& name, std::uint64_t offs
 
 MetaDataTail::MetaDataTail(Recording& recording, KeptMetaData kept)
     : recording_(recording), kept_(kept), size_(recording.size()) {
-    MetaDataParser& parser = recording_.parser();
-    if (parser.getStreamType() == Container::RawStream)
+    if (recording_.container() == Container::RawStream)
         throw Failure(fmt::format("{}: is a stream alone, without a movie around it", recording_.name()));
-    items_ = listTopLevel(parser.getStream(), parser.getStreamType());
-    requireRead(parser.getStream(), recording_.name());
+    items_ = topLevelItems(recording_.bytes(), recording_.container());
     requireWholeContainer();
     findTail();
     chooseCreators();
     if (kept_ == KeptMetaData::Newest) {
         requireReachableStreams();
-        streams_ = heldStreams(recording_);
+        streams_ = recording_.streams();
     }
     streamsLeftOut_ = recording_.validation().streamCount - streams_.size();
 }
 
 bool MetaDataTail::isMovie() const {
-    return recording_.parser().getStreamType() == Container::QuickTime;
+    return recording_.container() == Container::QuickTime;
 }
 
 void MetaDataTail::requireWholeContainer() const {
     const std::string& name = recording_.name();
-    const RepairPlan plan =
-        orUnreadable(name, [&] { return isMovie() ? planRepair(recording_.parser().getStream()) : RepairPlan(); });
+    const RepairPlan plan = isMovie() ? planRepair(recording_.bytes()) : RepairPlan();
     if (plan.state == RepairPlan::Repairable)
         throw Failure(
             fmt::format("{}: {}; 'zulm repair {} -o OUT' mends it first", name, plan.finding, shellWord(name)));
@@ -161,7 +160,7 @@ void MetaDataTail::chooseCreators() {
 
 std::string MetaDataTail::bytesOf(const ContainerItem& item) const {
     std::string bytes;
-    inPieces(recording_.bytes(), recording_.name(), item.offset, item.size,
+    inPieces(recording_.bytes().part(item.offset, item.size), recording_.name(),
              [&](std::string_view piece) { bytes += piece; });
     return bytes;
 }
@@ -201,15 +200,14 @@ void MetaDataTail::blankEarlierMetaData(const std::string& path, const std::stri
 
 void MetaDataTail::attachStreams(const std::string& path, const std::string& name) {
     std::vector<StreamSource> sources;
-    for (const HeldStream& held : streams_)
-        sources.push_back(StreamSource::part(recording_.path(), held.offset, held.present));
+    for (const StreamInfo& held : streams_)
+        sources.push_back(StreamSource::bytes(recording_.bytesOf(held), recording_.name()).unchecked());
     if (sources.empty())
         return;
     try {
-        const AttachResult attached =
-            SafeMovieSave(path).attach(sources, SafeMovieSave::Existing::Refuse, SafeMovieSave::Sources::Unchecked);
+        const AttachResult attached = SafeMovieSave(path).attach(sources);
         for (std::size_t i = 0; i < streams_.size(); ++i)
-            bytesCut_ += attached.streams[i].bytesCut + streams_[i].declared - streams_[i].present;
+            bytesCut_ += attached.streams[i].bytesCut + streams_[i].declaredBytes - streams_[i].presentBytes;
     } catch (const SaveError& error) {
         throw Failure(fmt::format("{}: {}", name, error.sentence()));
     }
@@ -217,32 +215,29 @@ void MetaDataTail::attachStreams(const std::string& path, const std::string& nam
 
 void MetaDataTail::appendChunks(const std::string& path, const std::string& name) const {
     std::uint64_t size = 0;
-    for (const HeldStream& held : streams_)
-        size += detail::s_chunkHeaderSize + padded(held.present);
+    for (const StreamInfo& held : streams_)
+        size += detail::s_chunkHeaderSize + padded(held.presentBytes);
     if (size > s_most32)
         throw Failure(fmt::format("{}: {} bytes of metadata are more than a chunk can hold", recording_.name(), size));
     std::fstream file = openForChange(path, name, std::ios::ate);
-    const auto writeHeader = [&](std::uint32_t type, std::uint64_t length) {
+    const auto writeHeader = [&file](FourCC type, std::uint64_t length) {
         const auto header = detail::chunkHeader(type, static_cast<std::uint32_t>(length));
         writeTo(file, {header.data(), header.size()});
     };
     if (!streams_.empty())
         writeHeader(detail::s_metaDataAtom, size);
-    const ReadBytes read = recording_.bytes();
-    for (const HeldStream& held : streams_) {
-        writeHeader(detail::s_streamAtom, held.present);
-        inPieces(read, recording_.name(), held.offset, held.present,
-                 [&](std::string_view piece) { writeTo(file, piece); });
-        writeTo(file, std::string_view("\0", held.present % 2));
+    for (const StreamInfo& held : streams_) {
+        writeHeader(detail::s_streamAtom, held.presentBytes);
+        inPieces(recording_.bytesOf(held), recording_.name(), [&](std::string_view piece) { writeTo(file, piece); });
+        writeTo(file, std::string_view("\0", held.presentBytes % 2));
     }
     requireWritten(file, name);
 }
 
 void MetaDataTail::appendItems(const std::string& path, const std::string& name) const {
     std::fstream file = openForChange(path, name, std::ios::ate);
-    const ReadBytes read = recording_.bytes();
     for (const ContainerItem& item : appended_)
-        inPieces(read, recording_.name(), item.offset, item.size,
+        inPieces(recording_.bytes().part(item.offset, item.size), recording_.name(),
                  [&](std::string_view piece) { writeTo(file, piece); });
     requireWritten(file, name);
 }

@@ -8,6 +8,8 @@
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/TemporaryFile.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
@@ -20,10 +22,13 @@
 
 namespace Zulm {
 
+using ZULMetaData::Container;
 using ZULMetaData::CopyError;
 using ZULMetaData::copyFileRange;
 using ZULMetaData::Descriptor;
+using ZULMetaData::extensionFor;
 using ZULMetaData::fileOpen;
+using ZULMetaData::MetaDataParser;
 using ZULMetaData::renameWithoutReplacing;
 using ZULMetaData::uninterrupted;
 
@@ -131,6 +136,16 @@ void writePart(const InputFile& input, std::uint64_t offset, std::uint64_t size,
     OutputFile file(output, {input.name()}, force);
     file.copyFrom(input.path(), offset, size);
     file.commit();
+}
+
+void requireOutputName(const std::string& output, Container::Type type, const std::string& input) {
+    const Container::Type named = MetaDataParser::streamTypeOf(output);
+    if (isNamedOtherwise(output, type))
+        throw Failure(fmt::format("{}: is named as a {} is, but would hold a {}; choose a name that ends in {}", output,
+                                  containerName(named), containerName(type), extensionFor(type)));
+    if (named == Container::Unknown && MetaDataParser::streamTypeOf(input) == type)
+        warn(fmt::format("{}: programs that go by the name do not take it for a {}; one that ends in {} is safe",
+                         output, containerName(type), extensionFor(type)));
 }
 
 std::ifstream openInput(const std::string& path) {

@@ -2,6 +2,8 @@
 
 // Files that appear whole or not at all.
 
+#include "ZULMetaData/Containers/ContainerType.h"
+
 #include <cstddef>
 #include <cstdint>
 #include <fstream>
@@ -59,6 +61,10 @@ void writeWholeFile(const std::string& path, const std::string& contents, const 
 
 /// Writes a part of `input` as a whole file. Throws `Failure`.
 void writePart(const InputFile& input, std::uint64_t offset, std::uint64_t size, const std::string& output, bool force);
+
+/// Throws `Failure` if the name of `output`, which gets a container of this type, tells another one. Warns if programs
+/// that go by the name find no metadata in `output` though they did in `input`.
+void requireOutputName(const std::string& output, ZULMetaData::Container::Type type, const std::string& input);
 
 /// Throws `Failure`.
 std::ifstream openInput(const std::string& path);

@@ -1,8 +1,8 @@
 #include "Tools/zulm/Printout.h"
 
+#include "Reports/Text.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <CLI/CLI.hpp>
 #include <fmt/core.h>
@@ -99,8 +99,8 @@ void Printout::beginFile(const Recording& recording) {
         document_->beginFile(recording);
 }
 
-void Printout::beginStream(const StreamInfo& stream, const EntryKeys* keys, bool isOnlyOne) {
-    kind_ = metaDataKindName(stream.type);
+void Printout::beginStream(const StreamReport& stream, const EntryKeys* keys, bool isOnlyOne) {
+    kind_ = stream.name();
     keys_ = keys;
     switch (format_) {
     case EntryFormat::Text: return beginText(isOnlyOne);

@@ -2,9 +2,8 @@
 
 // Everything that one run of `zulm dump` prints, in its format.
 
-#include "Tools/zulm/DumpDocument.h"
-#include "Tools/zulm/EntryFormat.h"
-#include "Tools/zulm/Recording.h"
+#include "Reports/DumpDocument.h"
+#include "Reports/EntryFormat.h"
 
 #include <nlohmann/json.hpp>
 
@@ -43,10 +42,10 @@ public:
     /// `writer` has the "files" of a report open; it is null for other formats than JSON.
     Printout(EntryFormat format, const Columns& columns, bool hasSeveralFiles, JsonWriter* writer);
 
-    void beginFile(const Recording& recording);
+    void beginFile(const ZULMetaData::Recording& recording);
 
     /// `keys` are those of the stream's entries; null if these cannot be decoded.
-    void beginStream(const StreamInfo& stream, const ZULMetaData::EntryKeys* keys, bool isOnlyOne);
+    void beginStream(const ZULMetaData::StreamReport& stream, const ZULMetaData::EntryKeys* keys, bool isOnlyOne);
 
     void print(const nlohmann::ordered_json& entry);
     void endStream();

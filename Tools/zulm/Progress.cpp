@@ -1,7 +1,7 @@
 #include "Tools/zulm/Progress.h"
 
+#include "Reports/Text.h"
 #include "Tools/zulm/Settings.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 

@@ -1,5 +1,6 @@
+#include "Reports/Text.h"
 #include "Tools/zulm/Choice.h"
-#include "Tools/zulm/HeldStreams.h"
+#include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/NormalForm.h"
 #include "Tools/zulm/OutputFile.h"
@@ -8,7 +9,6 @@
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/Settings.h"
-#include "Tools/zulm/Text.h"
 #include "Tools/zulm/TextPattern.h"
 
 #include <fmt/core.h>
@@ -122,7 +122,7 @@ ExitCode complainAboutWhatIsLeftOut(const std::string& name, const RedactedRecor
 }
 
 ExitCode complainAboutDamage(const std::string& path, const std::string& output) {
-    Recording copy(path, output);
+    Recording copy = openRecording(path, output);
     if (!copy.validation().isDamaged())
         return ExitFine;
     complain(fmt::format("{}: what was damaged in the input still is in the copy; 'zulm verify {}' says what", output,
@@ -154,7 +154,7 @@ template <class Work>
 auto orFailure(const RedactOptions& options, const std::string& name, Work work) {
     using Reason = RedactionError::Reason;
     try {
-        return orUnreadable(name, work);
+        return orFileError(name, work);
     } catch (const RedactionError& error) {
         const bool isAboutCopy = error.reason() == Reason::CannotWrite || error.reason() == Reason::FoundInCopy;
         throw Failure(
@@ -200,8 +200,8 @@ ExitCode preview(const RedactOptions& options, Recording& recording, RunReport& 
             visit(entry);
     };
     return orFailure(options, name, [&] {
-        std::istream& input = recording.parser().getStream();
-        RecordingRedactor redactor(input, recording.parser().getStreamType(), redaction, progressOf(options, name));
+        RecordingRedactor redactor(recording.parser().getStream(), recording.container(), redaction,
+                                   progressOf(options, name));
         if (redactor.isEmpty())
             return complainAboutNothing(recording, {});
         const RedactedRecording result = redactor.preview();
@@ -217,8 +217,7 @@ ExitCode preview(const RedactOptions& options, Recording& recording, RunReport& 
 ExitCode write(const RedactOptions& options, Recording& recording, RunReport& report) {
     const std::string& name = recording.name();
     return orFailure(options, name, [&] {
-        std::istream& input = recording.parser().getStream();
-        RecordingRedactor redactor(input, recording.parser().getStreamType(), redactionFor(options),
+        RecordingRedactor redactor(recording.parser().getStream(), recording.container(), redactionFor(options),
                                    progressOf(options, name));
         if (redactor.isEmpty())
             return complainAboutNothing(recording, {});
@@ -234,10 +233,10 @@ ExitCode write(const RedactOptions& options, Recording& recording, RunReport& re
 ExitCode runRedact(const RedactOptions& options) {
     return withReport("redact", options.json, {options.file, options.output}, [&](RunReport& report) {
         const InputFile input(options.file);
-        Recording recording(input.path(), input.name());
+        Recording recording = input.open();
         if (options.dryRun)
             return preview(options, recording, report);
-        requireOutputName(options.output, recording.parser().getStreamType(), input.path());
+        requireOutputName(options.output, recording.container(), input.path());
         return write(options, recording, report);
     });
 }

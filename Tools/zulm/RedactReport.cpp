@@ -1,9 +1,10 @@
 #include "Tools/zulm/RedactReport.h"
 
-#include "Tools/zulm/EntryFormat.h"
-#include "Tools/zulm/Report.h"
+#include "Reports/EntryFormat.h"
+#include "Reports/Report.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
+#include "ZULMetaData/StreamEntries.h"
 
 #include <fmt/core.h>
 

@@ -2,8 +2,7 @@
 
 // What a redaction does, as text and as JSON.
 
-#include "Tools/zulm/JsonWriter.h"
-#include "Tools/zulm/Recording.h"
+#include "Reports/JsonWriter.h"
 #include "ZULMetaDataBridge/Source/RecordingRedaction.h"
 
 #include <functional>

@@ -1,8 +1,8 @@
+#include "Reports/Text.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 

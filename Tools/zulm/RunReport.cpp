@@ -1,7 +1,7 @@
 #include "Tools/zulm/RunReport.h"
 
+#include "Reports/Text.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <utility>
 

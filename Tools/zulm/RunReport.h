@@ -2,8 +2,8 @@
 
 // What a command with --json prints: one JSON document for the whole run, written while the files are worked on.
 
+#include "Reports/Report.h"
 #include "Tools/zulm/Command.h"
-#include "Tools/zulm/Report.h"
 
 #include <functional>
 #include <string>

@@ -1,17 +1,17 @@
-#include "Tools/zulm/HeldStreams.h"
+#include "Reports/Text.h"
+#include "Tools/zulm/ChosenStreams.h"
+#include "Tools/zulm/FileAccess.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaDataBridge/Source/StreamSalvage.h"
 
 #include <fmt/core.h>
 
-#include <filesystem>
-#include <fstream>
 #include <memory>
 
 namespace Zulm {
@@ -37,9 +37,9 @@ const char* originText(SalvagedStream::Origin origin) {
 }
 
 SalvageReport search(const std::string& path) {
-    std::ifstream file = openInput(path);
-    Progress progress("searching " + path, std::filesystem::file_size(path));
-    return orUnreadable(path, [&] {
+    return orFileError(path, [&path] {
+        const ByteSource file = ByteSource::file(path);
+        Progress progress("searching " + path, file.size());
         const Container::Type type = recognizeContainer(file, path).type; // unknown ones are searched, too
         return StreamSalvage(file, type, [&](std::uint64_t done) { progress.moveTo(done); }).run();
     });

@@ -1,12 +1,11 @@
 #include "Tools/zulm/SavedMovie.h"
 
+#include "Reports/Text.h"
 #include "Tools/zulm/EndingSignals.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
-#include "Tools/zulm/Recording.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
-#include "ZULMetaData/ZULMMetaDataParser.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
@@ -48,14 +47,6 @@ void requireRepairable(const std::string& path) {
             throw Failure(unrepairableText(path, plan));
     } catch (const SaveError& error) {
         throw Failure(error.what());
-    }
-}
-
-const char* stateText(RepairPlan::State state) {
-    switch (state) {
-    case RepairPlan::Whole: return "whole";
-    case RepairPlan::Repairable: return "repairable";
-    default: return "unrepairable";
     }
 }
 
@@ -182,7 +173,7 @@ void printRepair(const std::string& path, const RepairPlan& plan) {
 }
 
 Json repairDocument(const RepairPlan& plan) {
-    Json document{{"state", stateText(plan.state)}, {"changes", Json::array()}};
+    Json document{{"state", repairStateName(plan.state)}, {"changes", Json::array()}};
     for (const RepairChange& change : plan.changes)
         document["changes"].push_back({{"offset", change.offset},
                                        {"before", hexText(change.before)},

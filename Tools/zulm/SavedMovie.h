@@ -46,11 +46,11 @@ public:
     /// The file that the result is in.
     const std::string& name() const { return name_; }
 
-    /// Lets `look` see the movie as it is, before anything is copied. Throws `Failure`.
+    /// Returns what `look` makes of the path of the movie, before anything is copied. Throws `Failure`.
     template <class Look>
-    void examine(Look look) const {
+    auto examine(Look look) const {
         try {
-            look(ZULMetaData::SafeMovieSave(path_));
+            return look(path_);
         } catch (const ZULMetaData::SaveError& error) {
             fail(error);
         }

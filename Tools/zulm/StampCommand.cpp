@@ -1,9 +1,9 @@
-#include "Tools/zulm/InfoReport.h"
+#include "Reports/InfoReport.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SavedMovie.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 

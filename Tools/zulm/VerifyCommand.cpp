@@ -1,12 +1,12 @@
+#include "Reports/Findings.h"
+#include "Reports/Text.h"
+#include "Reports/VerifyReport.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Command.h"
-#include "Tools/zulm/Findings.h"
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "Tools/zulm/Text.h"
-#include "Tools/zulm/VerifyReport.h"
 
 #include <fmt/core.h>
 

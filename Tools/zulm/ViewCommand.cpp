@@ -1,11 +1,10 @@
+#include "Reports/Layout.h"
+#include "Reports/Text.h"
+#include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/Command.h"
-#include "Tools/zulm/HeldStreams.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/Layout.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
-#include "Tools/zulm/Recording.h"
-#include "Tools/zulm/Text.h"
 #include "Tools/zulm/ViewerPage.h"
 
 #include "SharedDependencies/EndianFile.h"
@@ -53,7 +52,7 @@ std::string pageFor(const ViewOptions& options) {
     std::ifstream file = openInput(options.page);
     std::string page(std::filesystem::file_size(options.page), '\0');
     file.read(page.data(), static_cast<std::streamsize>(page.size()));
-    requireRead(file, options.page);
+    orFileError(options.page, [&file] { requireReadable(file); });
     return page;
 }
 
@@ -84,7 +83,7 @@ void writeMovie(std::ofstream& stream, const std::string& movie, const std::stri
         write(stream, base64({piece.data(), static_cast<std::size_t>(from.gcount())}));
         progress.advance(static_cast<std::uint64_t>(from.gcount()));
     }
-    requireRead(from, name);
+    orFileError(name, [&from] { requireReadable(from); });
 }
 
 void writePage(OutputFile& file, const ViewOptions& options, const InputFile& input, const PageParts& page,
@@ -108,7 +107,7 @@ void writePage(OutputFile& file, const ViewOptions& options, const InputFile& in
 
 /// Where the page finds the movie; null where there is none to show.
 Json movieFor(const ViewOptions& options, const InputFile& input, Recording& recording) {
-    const bool isStream = recording.parser().getStreamType() == Container::RawStream;
+    const bool isStream = recording.container() == Container::RawStream;
     if (isStream && options.embed)
         throw Failure(fmt::format("{}: is a stream alone, without a movie to embed", input.name()));
     if (options.embed && recording.size() > s_mostEmbedded)
@@ -125,8 +124,8 @@ Json movieFor(const ViewOptions& options, const InputFile& input, Recording& rec
 
 ExitCode runView(const ViewOptions& options) {
     const InputFile input(options.file);
-    Recording recording(input.path(), input.name());
-    if (recording.parser().getAvailableMetaDataUUIDs().empty())
+    Recording recording = input.open();
+    if (recording.streams().empty())
         return complainAboutNothing(recording, {});
     const PageParts page(options);
     OutputFile file(options.output, {input.name(), options.page}, options.force);

@@ -1,9 +1,10 @@
 #include "Tools/zulm/ViewerPage.h"
 
-#include "Tools/zulm/InfoReport.h"
-#include "Tools/zulm/Report.h"
-#include "Tools/zulm/Text.h"
-#include "Tools/zulm/VerifyReport.h"
+#include "Reports/InfoReport.h"
+#include "Reports/Report.h"
+#include "Reports/Text.h"
+#include "Reports/VerifyReport.h"
+#include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 
 #include <fmt/core.h>
 
@@ -25,17 +26,12 @@ bool isPlainInAddress(char c) {
 } // namespace
 
 Json viewDocument(Recording& recording, const Json& movie) {
-    const std::string excerpt = orUnreadable(recording.name(), [&] { return metaDataExcerpt(recording.parser()); });
+    const std::string excerpt = orFileError(recording.name(), [&] { return metaDataExcerpt(recording.parser()); });
     const std::string name = std::filesystem::path(recording.name()).filename().string();
-    return {{"schema", "zulm.view"},
-            {"schema_version", 1},
-            {"tool_version", ZULM_VERSION},
-            {"name", validText(name)},
-            {"moviePoster", nullptr},
-            {"info", infoDocument(recording)},
-            {"verify", verifyDocument(recording.name(), recording.validation())},
-            {"metadata", base64(excerpt)},
-            {"movie", movie}};
+    return {{"schema", "zulm.view"},           {"schema_version", 1},
+            {"tool_version", ZULM_VERSION},    {"name", validText(name)},
+            {"info", infoDocument(recording)}, {"verify", verifyDocument(recording.name(), recording.validation())},
+            {"metadata", base64(excerpt)},     {"movie", movie}};
 }
 
 std::string relativeAddress(const std::string& file, const std::string& folder) {
@@ -48,7 +44,7 @@ std::string relativeAddress(const std::string& file, const std::string& folder) 
 }
 
 std::string embeddedAddress(const Recording& recording) {
-    const bool isWave = recording.container() == containerName(Container::Riff);
+    const bool isWave = recording.container() == Container::Riff;
     return fmt::format("data:{};base64,", isWave ? "audio/wav" : "video/mp4");
 }
 

@@ -51,17 +51,17 @@ inline constexpr std::tuple s_rectFields{Field{"x", &Rect::x}, Field{"y", &Rect:
 
 /// Where the window on top was.
 struct TopmostWindowKind {
-    using Value = Rect;                               ///< the type of the values in the stream
-    static constexpr uuid type = s_topmostWindowUUID; ///< the identifier in the header of the stream
-    static constexpr int version = 1;                 ///< the version that is written; earlier ones are read too
-    static constexpr auto fields = s_rectFields;      ///< the keys of its entries, which "timestamp" follows
+    using Value = Rect;                                     ///< the type of the values in the stream
+    static constexpr uuid type = s_topmostWindowUUID;       ///< the identifier in the header of the stream
+    static constexpr int version = detail::versionOf(type); ///< the version that is written; earlier ones are read too
+    static constexpr auto fields = s_rectFields;            ///< the keys of its entries, which "timestamp" follows
 };
 
 /// What the cursor hovered over.
 struct HoverRectKind {
     using Value = Rect;
     static constexpr uuid type = s_hoverRectUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr auto fields = s_rectFields;
 };
 
@@ -69,7 +69,7 @@ struct HoverRectKind {
 struct RecordingRegionKind {
     using Value = Rect;
     static constexpr uuid type = s_recordingRegionUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr auto fields = s_rectFields;
 };
 
@@ -77,7 +77,7 @@ struct RecordingRegionKind {
 struct ScrollActionKind {
     using Value = Point;
     static constexpr uuid type = s_scrollActionUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr auto fields = s_pointFields;
 };
 
@@ -85,7 +85,7 @@ struct ScrollActionKind {
 struct CursorLocationKind {
     using Value = Point;
     static constexpr uuid type = s_cursorLocationUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr auto fields = s_pointFields;
 };
 
@@ -93,7 +93,7 @@ struct CursorLocationKind {
 struct CPUUsageKind {
     using Value = float;
     static constexpr uuid type = s_cpuUsageUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"cpuUsage", wholeValue}};
 };
 
@@ -101,7 +101,7 @@ struct CPUUsageKind {
 struct CursorOpacityKind {
     using Value = double;
     static constexpr uuid type = s_cursorOpacityUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"opacity", wholeValue}};
 };
 
@@ -109,7 +109,7 @@ struct CursorOpacityKind {
 struct ScaleFactorKind {
     using Value = std::int32_t;
     static constexpr uuid type = s_recordingScaleFactorUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"scaleFactor", wholeValue}};
 };
 
@@ -117,7 +117,7 @@ struct ScaleFactorKind {
 struct SlideInfoTitleKind {
     using Value = std::string;
     static constexpr uuid type = s_slideTitlesUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"title", textFromUTF8}};
 };
 
@@ -125,7 +125,7 @@ struct SlideInfoTitleKind {
 struct SlideInfoTextKind {
     using Value = std::string;
     static constexpr uuid type = s_slideTextUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"text", textFromUTF8}};
 };
 
@@ -133,7 +133,7 @@ struct SlideInfoTextKind {
 struct SlideInfoCommentKind {
     using Value = std::string;
     static constexpr uuid type = s_slideCommentUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"comment", textFromUTF8}};
 };
 
@@ -141,7 +141,7 @@ struct SlideInfoCommentKind {
 struct TopmostWindowTitleKind {
     using Value = std::string;
     static constexpr uuid type = s_topmostWindowTitleUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"title", textFromUTF8}};
 };
 
@@ -149,7 +149,7 @@ struct TopmostWindowTitleKind {
 struct TopmostAppNameKind {
     using Value = std::string;
     static constexpr uuid type = s_topmostAppNameUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"name", textFromUTF8}};
 };
 
@@ -160,7 +160,7 @@ ZULMETADATA_API EntryValue entryImage(const CursorImage& cursor);
 struct CursorImageKind {
     using Value = CursorImage;
     static constexpr uuid type = s_cursorImageUUID;
-    static constexpr int version = 2;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"image", entryImage}, Field{"id", &CursorImage::uniqueId},
                                        Field{"hotspotOffsetX", &CursorImage::hotspotOffsetX},
                                        Field{"hotspotOffsetY", &CursorImage::hotspotOffsetY}};
@@ -170,7 +170,7 @@ struct CursorImageKind {
 struct CursorActionKind {
     using Value = std::int32_t;
     static constexpr uuid type = s_cursorActionUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"action", HumanReadableActions::CursorActionToString},
                                        Field{"rawActionValue", wholeValue}};
 };
@@ -189,7 +189,7 @@ inline std::string keyModifiersText(const KeyStroke& key) {
 struct KeyboardActionKind {
     using Value = KeyStroke;
     static constexpr uuid type = s_keyboardActionUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{
         Field{"characterCode", &KeyStroke::characterCode}, Field{"characterString", keyText},
         Field{"eventFlagsCode", &KeyStroke::eventFlagsCode}, Field{"eventFlagsString", keyModifiersText}};
@@ -207,7 +207,7 @@ std::string systemText(const std::list<std::string>& texts) {
 struct SystemDataKind {
     using Value = std::list<std::string>;
     static constexpr uuid type = s_systemDataUUID;
-    static constexpr int version = 1;
+    static constexpr int version = detail::versionOf(type);
     static constexpr std::tuple fields{Field{"processorCount", systemText<0>},
                                        Field{"activeProcessorCount", systemText<1>}, Field{"osVersion", systemText<2>},
                                        Field{"ram", systemText<3>}};

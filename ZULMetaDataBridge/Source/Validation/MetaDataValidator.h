@@ -172,6 +172,9 @@ struct ZULMETADATA_API StreamReport {
 
     /// Its kind, or its identifier where that has no name.
     std::string name() const;
+
+    /// As it is stored, unless it is cut short.
+    MetaDataHeader header() const { return {type, version, fixedEntrySize}; }
 };
 
 /// What a file holds, and what is wrong with it.

@@ -16,6 +16,10 @@ const char* severityText(ZULMetaData::Severity severity);
 /// "cursorLocation at offset 56: the last entry has 4 of 16 bytes [torn-entry]"
 std::string findingText(const ZULMetaData::Finding& finding);
 
+/// "at offset 56: the last entry has 4 of 16 bytes (2 more)": the first damage in the stream, and how much else. Empty
+/// if there is none.
+std::string damageIn(const ZULMetaData::StreamReport& stream);
+
 /// {"code": ..., "severity": "damage" or "notice", "place": ..., "offset": ..., "message": ...}
 nlohmann::ordered_json findingDocument(const ZULMetaData::Finding& finding);
 

@@ -3,8 +3,8 @@
 // What `zulm dump --format json` prints, written as the entries are read: an hour of recording does not have to fit
 // into memory as a document.
 
-#include "Tools/zulm/JsonWriter.h"
-#include "Tools/zulm/Recording.h"
+#include "Reports/JsonWriter.h"
+#include "ZULMetaDataBridge/Source/Recording.h"
 
 #include <vector>
 
@@ -15,10 +15,10 @@ public:
     /// `writer` has the "files" of a report open and must outlive this.
     explicit DumpDocument(JsonWriter& writer) : writer_(writer) {}
 
-    void beginFile(const Recording& recording);
+    void beginFile(const ZULMetaData::Recording& recording);
 
     /// A stream that is not decoded has no entries.
-    void beginStream(const StreamInfo& stream, bool isDecoded);
+    void beginStream(const ZULMetaData::StreamReport& stream, bool isDecoded);
     void add(const nlohmann::ordered_json& entry) { writer_.element(entry); }
     void endStream();
     void endFile();
@@ -28,7 +28,8 @@ private:
     bool isDecoded_ = false;
 };
 
-/// The whole document of one file, with every entry of the streams of these types.
-void writeDump(Recording& recording, const std::vector<ZULMetaData::uuid>& types, const TextSink& sink);
+/// The whole document of one file, with every entry of these of its streams.
+void writeDump(ZULMetaData::Recording& recording, const std::vector<ZULMetaData::StreamReport>& streams,
+               const TextSink& sink);
 
 } // namespace Zulm

@@ -1,8 +1,9 @@
-#include "Tools/zulm/InfoReport.h"
+#include "Reports/InfoReport.h"
 
-#include "Tools/zulm/Findings.h"
-#include "Tools/zulm/Report.h"
-#include "Tools/zulm/Text.h"
+#include "Reports/Findings.h"
+#include "Reports/Report.h"
+#include "Reports/Text.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
@@ -15,18 +16,18 @@ using Json = nlohmann::ordered_json;
 
 namespace {
 
-Json streamDocument(const StreamInfo& stream) {
+Json streamDocument(const StreamReport& stream) {
     Json document{{"kind", kindDocument(stream.type)},
                   {"uuid", uuidText(stream.type)},
                   {"version", stream.version},
-                  {"entries", stream.isDecodable ? Json(stream.entries) : Json(nullptr)},
+                  {"entries", isDecodable(stream.header()) ? Json(stream.wholeEntries) : Json(nullptr)},
                   {"first_time", numberDocument(stream.firstTime)},
                   {"last_time", numberDocument(stream.lastTime)},
                   {"entries_per_second", numberDocument(entriesPerSecond(stream))},
-                  {"offset", stream.range.offset},
-                  {"bytes", stream.range.length}};
-    if (!stream.damage.empty())
-        document["damage"] = stream.damage;
+                  {"offset", stream.offset},
+                  {"bytes", stream.declaredBytes}};
+    if (const std::string damage = damageIn(stream); !damage.empty())
+        document["damage"] = damage;
     return document;
 }
 
@@ -49,15 +50,15 @@ std::string shownCreator(const CreatorAttributes& creator) {
 namespace {
 
 Json foreignDocument(const LayoutItem& atom) {
-    return {{"type", printable(atom.item.type)}, {"offset", atom.item.offset}, {"size", atom.size}};
+    return {{"type", printable(atom.item.type.text())}, {"offset", atom.item.offset}, {"size", atom.size}};
 }
 
 } // namespace
 
-std::optional<double> entriesPerSecond(const StreamInfo& stream) {
-    if (!stream.firstTime || !stream.lastTime || stream.entries < 2)
+std::optional<double> entriesPerSecond(const StreamReport& stream) {
+    if (!stream.firstTime || !stream.lastTime || stream.wholeEntries < 2)
         return std::nullopt;
-    const double rate = static_cast<double>(stream.entries - 1) / (*stream.lastTime - *stream.firstTime);
+    const double rate = static_cast<double>(stream.wholeEntries - 1) / (*stream.lastTime - *stream.firstTime);
     return std::isfinite(rate) && rate > 0 ? std::optional(rate) : std::nullopt;
 }
 
@@ -69,23 +70,17 @@ void visitForeignAtoms(Recording& recording, const std::function<void(const Layo
 }
 
 FileInfo inspect(Recording& recording) {
-    const ValidationReport& validation = recording.validation();
-    const auto read = [&](auto value) {
-        requireRead(recording.parser().getStream(), recording.name());
-        return value;
-    };
-    return {recording.name(),         recording.container(),
-            recording.size(),         read(movieDuration(recording.parser())),
-            recording.streams(),      read(readRecordingInfo(recording.parser())),
-            validation.allFindings(), validation.isDamaged()};
+    return {recording.duration(), recording.examinedStreams(), recording.creators()};
 }
 
 void writeInfo(JsonWriter& writer, Recording& recording, const FileInfo& file) {
     writer.beginObject();
-    writer.members(fileHeader(file.name));
-    writer.members({{"container", file.container}, {"bytes", file.bytes}, {"duration", numberDocument(file.duration)}});
+    writer.members(fileHeader(recording.name()));
+    writer.members({{"container", containerName(recording.container())},
+                    {"bytes", recording.size()},
+                    {"duration", numberDocument(file.duration)}});
     writer.beginArray("streams");
-    for (const StreamInfo& stream : file.streams)
+    for (const StreamReport& stream : file.streams)
         writer.element(streamDocument(stream));
     writer.end();
     writer.beginArray("creators");
@@ -96,7 +91,7 @@ void writeInfo(JsonWriter& writer, Recording& recording, const FileInfo& file) {
     visitForeignAtoms(recording, [&](const LayoutItem& atom) { writer.element(foreignDocument(atom)); });
     writer.end();
     writer.beginArray("warnings");
-    for (const Finding& finding : file.warnings)
+    for (const Finding& finding : recording.validation().allFindings())
         writer.element(findingDocument(finding));
     writer.end();
     writer.end();

@@ -1,4 +1,4 @@
-#include "Tools/zulm/Text.h"
+#include "Reports/Text.h"
 
 #include "Tests/Tools/ToolRun.h"
 #include "ZULMetaDataBridge/Source/EntryTexts.h"

@@ -1,6 +1,6 @@
-#include "Tools/zulm/Report.h"
+#include "Reports/Report.h"
 
-#include "Tools/zulm/Text.h"
+#include "Reports/Text.h"
 
 #include <cmath>
 
@@ -35,6 +35,11 @@ void addText(Json& document, const std::string& key, const std::string& bytes) {
     document[key] = validText(bytes);
     if (document[key] != bytes)
         document[key + "_base64"] = base64(bytes);
+}
+
+Json kindDocument(const ZULMetaData::uuid& type) {
+    const ZULMetaData::MetaDataKind* kind = ZULMetaData::findMetaDataKind(type);
+    return kind ? Json(kind->name) : Json(nullptr);
 }
 
 Json numberDocument(std::optional<double> number) {

@@ -2,7 +2,8 @@
 
 // The JSON documents of the commands that report.
 
-#include "Tools/zulm/JsonWriter.h"
+#include "Reports/JsonWriter.h"
+#include "ZULMetaData/ZULMMetaDataUUIDs.h"
 
 #include <nlohmann/json.hpp>
 
@@ -30,6 +31,9 @@ nlohmann::ordered_json fileHeader(const std::string& path);
 
 /// Adds a text, and its bytes as "KEY_base64" if they are not UTF-8.
 void addText(nlohmann::ordered_json& document, const std::string& key, const std::string& bytes);
+
+/// The name of a registered kind, else null.
+nlohmann::ordered_json kindDocument(const ZULMetaData::uuid& type);
 
 /// A number as it is, "Infinity", "-Infinity" or "NaN" where it is none, null where there is nothing.
 nlohmann::ordered_json numberDocument(std::optional<double> number);

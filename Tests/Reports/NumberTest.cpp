@@ -1,4 +1,4 @@
-#include "Tools/zulm/Number.h"
+#include "Reports/Number.h"
 
 #include <gtest/gtest.h>
 

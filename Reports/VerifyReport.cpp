@@ -1,8 +1,8 @@
-#include "Tools/zulm/VerifyReport.h"
+#include "Reports/VerifyReport.h"
 
-#include "Tools/zulm/Findings.h"
-#include "Tools/zulm/Recording.h"
-#include "Tools/zulm/Report.h"
+#include "Reports/Findings.h"
+#include "Reports/Report.h"
+#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 namespace Zulm {
 

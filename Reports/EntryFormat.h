@@ -2,7 +2,7 @@
 
 // Decoded entries as JSON documents, and these as lines of text, NDJSON and CSV.
 
-#include "Tools/zulm/JsonWriter.h"
+#include "Reports/JsonWriter.h"
 #include "ZULMetaDataBridge/Source/EntryBuilding.h"
 #include "ZULMetaDataBridge/Source/StoredFields.h"
 

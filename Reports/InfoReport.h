@@ -2,13 +2,12 @@
 
 // What `zulm info` tells of a file.
 
-#include "Tools/zulm/JsonWriter.h"
-#include "Tools/zulm/Layout.h"
-#include "Tools/zulm/Recording.h"
+#include "Reports/JsonWriter.h"
+#include "Reports/Layout.h"
+#include "ZULMetaDataBridge/Source/Recording.h"
 
 #include <nlohmann/json.hpp>
 
-#include <cstdint>
 #include <functional>
 #include <optional>
 #include <string>
@@ -16,34 +15,30 @@
 
 namespace Zulm {
 
+/// What is read before the first word of it is told.
 struct FileInfo {
-    std::string name;
-    std::string container;
-    std::uint64_t bytes = 0;
     std::optional<double> duration;
-    std::vector<StreamInfo> streams;
+    std::vector<ZULMetaData::StreamReport> streams;
     std::vector<ZULMetaData::ZCAPHeader> creators;
-    std::vector<ZULMetaData::Finding> warnings;
-    bool isDamaged = false;
 };
 
-/// Throws `Failure` if the file cannot be read.
-FileInfo inspect(Recording& recording);
+/// Throws `FileError` if the file cannot be read.
+FileInfo inspect(ZULMetaData::Recording& recording);
 
 /// The rate between the first and the last entry; empty if they are at one time or have none.
-std::optional<double> entriesPerSecond(const StreamInfo& stream);
+std::optional<double> entriesPerSecond(const ZULMetaData::StreamReport& stream);
 
 /// Visits what lies inside of the file's metadata and is no stream.
-void visitForeignAtoms(Recording& recording, const std::function<void(const LayoutItem& atom)>& visit);
+void visitForeignAtoms(ZULMetaData::Recording& recording, const std::function<void(const LayoutItem& atom)>& visit);
 
 /// The texts of a creator with everything that is stored in their fields.
 nlohmann::ordered_json creatorDocument(const ZULMetaData::CreatorAttributes& creator);
 std::string shownCreator(const ZULMetaData::CreatorAttributes& creator); ///< "Mac 1.2 on version 6.1.0"
 
 /// Writes the file's object of `zulm info --json`.
-void writeInfo(JsonWriter& writer, Recording& recording, const FileInfo& file);
+void writeInfo(JsonWriter& writer, ZULMetaData::Recording& recording, const FileInfo& file);
 
 /// The same object as a whole.
-nlohmann::ordered_json infoDocument(Recording& recording);
+nlohmann::ordered_json infoDocument(ZULMetaData::Recording& recording);
 
 } // namespace Zulm

@@ -1,9 +1,9 @@
-#include "Tools/zulm/EntryFormat.h"
+#include "Reports/EntryFormat.h"
 
 #include "Platform/Image.h"
-#include "Tools/zulm/Number.h"
-#include "Tools/zulm/Report.h"
-#include "Tools/zulm/Text.h"
+#include "Reports/Number.h"
+#include "Reports/Report.h"
+#include "Reports/Text.h"
 
 #include <fmt/core.h>
 #include <fmt/ranges.h>

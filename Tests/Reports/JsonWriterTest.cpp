@@ -1,5 +1,5 @@
-#include "Tools/zulm/JsonWriter.h"
-#include "Tools/zulm/Report.h"
+#include "Reports/JsonWriter.h"
+#include "Reports/Report.h"
 
 #include <gtest/gtest.h>
 

@@ -1,6 +1,6 @@
-#include "Tools/zulm/JsonWriter.h"
+#include "Reports/JsonWriter.h"
 
-#include "Tools/zulm/Text.h"
+#include "Reports/Text.h"
 
 namespace Zulm {
 

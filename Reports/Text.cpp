@@ -1,4 +1,4 @@
-#include "Tools/zulm/Text.h"
+#include "Reports/Text.h"
 
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
 

@@ -1,7 +1,7 @@
-#include "Tools/zulm/HeldStreams.h"
+#include "Tools/zulm/ChosenStreams.h"
 
+#include "Reports/Text.h"
 #include "Tools/zulm/Choice.h"
-#include "Tools/zulm/Text.h"
 
 #include <fmt/core.h>
 #include <fmt/ranges.h>
@@ -9,7 +9,6 @@
 #include <algorithm>
 #include <filesystem>
 #include <sstream>
-#include <system_error>
 
 namespace Zulm {
 
@@ -30,37 +29,22 @@ bool isIdentifier(const std::string& text) {
 }
 
 std::string checkKind(const std::string& kind) {
+    if (isIdentifier(kind) || findMetaDataKind(kind))
+        return {};
     std::vector<std::string> names;
     names.reserve(s_metaDataKinds.size());
     for (const MetaDataKind& registered : s_metaDataKinds)
         names.emplace_back(registered.name);
-    if (isIdentifier(kind) || std::find(names.begin(), names.end(), kind) != names.end())
-        return {};
     return fmt::format("no kind of stream is called '{}'{} (the kinds are {})", kind, suggestionFor(kind, names),
                        fmt::join(names, ", "));
 }
 
 } // namespace
 
-std::vector<HeldStream> heldStreams(Recording& recording, const std::vector<std::string>& kinds) {
-    MetaDataParser& parser = recording.parser();
-    const std::uint64_t total = recording.size();
-    std::vector<HeldStream> streams;
-    for (const uuid& type : parser.getAvailableMetaDataUUIDs()) {
-        const auto [offset, length] = parser.fileDataForUUID(type);
-        if (isChosen(type, kinds))
-            streams.push_back({type, offset, length, std::min(length, total - std::min(offset, total))});
-    }
+std::vector<StreamInfo> chosenStreams(Recording& recording, const std::vector<std::string>& kinds) {
+    std::vector<StreamInfo> streams = recording.streams();
+    std::erase_if(streams, [&kinds](const StreamInfo& stream) { return !isChosen(stream.type, kinds); });
     return streams;
-}
-
-StreamEntries entriesOf(Recording& recording, const HeldStream& stream) {
-    const ReadBytes read = recording.bytes();
-    return ZULMetaData::entriesOf(
-        [read, offset = stream.offset](std::uint64_t position, std::span<char> bytes) {
-            return read(offset + position, bytes);
-        },
-        stream.present);
 }
 
 CLI::Option* addStreamOption(CLI::App& command, std::vector<std::string>& kinds, const std::string& description,
@@ -84,9 +68,7 @@ void requireOneOf(const std::vector<uuid>& fitting, const std::string& option, c
 }
 
 uuid typeNamed(const std::string& kind) {
-    const auto registered = std::find_if(s_metaDataKinds.begin(), s_metaDataKinds.end(),
-                                         [&](const MetaDataKind& candidate) { return candidate.name == kind; });
-    if (registered != s_metaDataKinds.end())
+    if (const MetaDataKind* registered = findMetaDataKind(kind))
         return registered->type;
     uuid type{};
     std::istringstream(kind) >> type;
@@ -104,24 +86,9 @@ ExitCode complainAboutNothing(const Recording& recording, const std::vector<std:
     return ExitNoMetaData;
 }
 
-void createFolder(const std::string& folder) {
-    std::error_code error;
-    std::filesystem::create_directories(folder, error);
-    if (error)
-        throw Failure(fmt::format("{}: cannot be created: {}", folder, error.message()));
-    if (!std::filesystem::is_directory(folder, error))
-        throw Failure(error ? fmt::format("{}: {}", folder, error.message()) : fmt::format("{}: is no folder", folder));
-}
-
 std::string streamFileIn(const std::string& folder, const uuid& type, std::size_t number) {
     const std::string suffix = number > 1 ? fmt::format("-{}", number) : "";
     return (std::filesystem::path(folder) / fmt::format("{}{}.dat", metaDataKindName(type), suffix)).string();
-}
-
-void requireFree(const std::vector<std::string>& outputs, bool force) {
-    for (const std::string& output : outputs)
-        if (!force && std::filesystem::exists(output))
-            throw Failure(fmt::format("{}: exists already; --force replaces it", output));
 }
 
 } // namespace Zulm

@@ -9,9 +9,13 @@
 #include <optional>
 #include <string>
 
-namespace Zulm {
+namespace ZULMetaData {
 
 class Recording;
+
+} // namespace ZULMetaData
+
+namespace Zulm {
 
 struct LayoutItem {
     ZULMetaData::ContainerItem item;
@@ -45,7 +49,7 @@ struct LayoutVisitor {
 /// Which items are visited. A movie may hold hundreds of thousands that hold no metadata.
 enum class LayoutPart { Whole, MetaData };
 
-/// Visits the items of a container, and no item of a bare stream. Throws `Failure` if the file cannot be read.
-void walkLayout(Recording& recording, LayoutPart part, const LayoutVisitor& visitor);
+/// Visits the items of a container, and no item of a bare stream. Throws `FileError` if the file cannot be read.
+void walkLayout(ZULMetaData::Recording& recording, LayoutPart part, const LayoutVisitor& visitor);
 
 } // namespace Zulm

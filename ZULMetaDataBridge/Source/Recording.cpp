@@ -1,0 +1,107 @@
+#include "ZULMetaDataBridge/Source/Recording.h"
+
+#include "ZULMetaData/ByteSourceStream.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaData/Containers/MovieDuration.h"
+#include "ZULMetaData/Containers/RecordingInfo.h"
+
+#include <algorithm>
+#include <span>
+#include <stdexcept>
+#include <utility>
+
+namespace ZULMetaData {
+
+namespace {
+
+/// Puts the name before the refusal.
+template <class Open>
+std::unique_ptr<MetaDataParser> opened(const std::string& name, Open open) {
+    try {
+        return orFileError(name, open);
+    } catch (const FileError&) {
+        throw;
+    } catch (const std::runtime_error& refusal) {
+        throw std::runtime_error(name + ": " + refusal.what());
+    }
+}
+
+Container::Type recognizedType(const ByteSource& bytes, const std::string& name) {
+    const RecognizedContainer recognized = recognizeContainer(bytes, name);
+    if (recognized.type == Container::Unknown)
+        throw std::runtime_error(recognized.refusal());
+    return recognized.type;
+}
+
+/// Names the file in every error.
+ByteSource named(const ByteSource& bytes, const std::string& name) {
+    return {bytes.size(), [bytes, name](std::uint64_t position, std::span<char> to) {
+                return orFileError(name, [&] { return bytes.read(position, to); });
+            }};
+}
+
+} // namespace
+
+Recording::Recording(const FileLocation& file, std::string name)
+    : path_(utf8Path(file)), name_(name.empty() ? path_ : std::move(name)),
+      parser_(opened(name_, [this] { return openContainer(path_); })),
+      bytes_(orFileError(name_, [this] { return named(ByteSource::stream(parser_->getStream()), name_); })) {}
+
+Recording::Recording(ByteSource bytes, std::string name)
+    : name_(std::move(name)), input_(std::make_unique<ByteSourceStream>(bytes)),
+      parser_(opened(name_, [&] { return openContainer(*input_, recognizedType(bytes, name_)); })),
+      bytes_(named(bytes, name_)) {}
+
+std::optional<double> Recording::duration() const {
+    return movieDuration(bytes_, container());
+}
+
+std::vector<ZCAPHeader> Recording::creators() const {
+    return readRecordingInfo(bytes_, container());
+}
+
+const ValidationReport& Recording::validation() {
+    if (!validation_)
+        validation_ = validateRecording(bytes_, container());
+    return *validation_;
+}
+
+std::vector<StreamInfo> Recording::streams() const {
+    std::vector<StreamInfo> streams;
+    for (const uuid& type : parser_->getAvailableMetaDataUUIDs()) {
+        const auto [offset, length] = parser_->fileDataForUUID(type);
+        streams.push_back({type, offset, length, bytes_.part(offset, length).size()});
+    }
+    return streams;
+}
+
+StreamReport Recording::examine(const StreamInfo& stream) {
+    const std::vector<StreamReport>& reports = validation().streams;
+    const auto found = std::find_if(reports.begin(), reports.end(),
+                                    [&](const StreamReport& report) { return report.offset == stream.offset; });
+    const bool isThere = found != reports.end() && found->presentBytes >= s_metaDataHeaderSize;
+    StreamReport report = isThere ? *found : StreamReport();
+    report.type = stream.type;
+    report.offset = stream.offset;
+    report.declaredBytes = stream.declaredBytes;
+    return report;
+}
+
+std::vector<StreamReport> Recording::examinedStreams() {
+    std::vector<StreamReport> reports;
+    for (const StreamInfo& stream : streams())
+        reports.push_back(examine(stream));
+    return reports;
+}
+
+std::vector<StreamReport> Recording::hiddenStreams() {
+    std::vector<StreamReport> hidden;
+    for (const StreamReport& stream : validation().streams) {
+        const auto [offset, length] = parser_->fileDataForUUID(stream.type);
+        if (stream.presentBytes >= s_metaDataHeaderSize && (length == 0 || offset != stream.offset))
+            hidden.push_back(stream);
+    }
+    return hidden;
+}
+
+} // namespace ZULMetaData
