@@ -5,6 +5,7 @@
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Recording.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/TemporaryFile.h"
 #include "Tools/zulm/Text.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
@@ -139,6 +140,7 @@ void SavedMovie::fail(const SaveError& error) const {
 /// What was done is undone by now.
 void SavedMovie::endBy(const Interruption& interruption) const {
     complain(fmt::format("{}: interrupted; it is what it was before", name_));
+    removeTemporaryFiles();
     std::signal(interruption.signal, SIG_DFL);
     std::raise(interruption.signal);
     throw Failure(fmt::format("{}: interrupted", name_));
