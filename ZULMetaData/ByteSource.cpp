@@ -38,6 +38,7 @@ ByteSource::ByteSource(std::uint64_t size, Read read) : read_(std::move(read)), 
 
 ByteSource ByteSource::file(const std::string& path) {
     const auto file = std::make_shared<std::ifstream>();
+    file->rdbuf()->pubsetbuf(nullptr, 0); // whoever reads small pieces has a buffer of its own
     errno = 0;
     fileOpen(*file, path.c_str(), std::ios_base::binary);
     std::error_code reason(errno, std::generic_category());

@@ -58,6 +58,7 @@
 #include "Source/MetaDataWriters/TopmostWindowMetaDataWriter.h"
 #include "Source/MetaDataWriters/TopmostWindowTitleMetaDataWriter.h"
 #include "Source/Recording.h"
+#include "Source/RecordingCompaction.h"
 #include "Source/RecordingRedaction.h"
 #include "Source/ReportedNames.h"
 #include "Source/SafeMovieSave.h"

@@ -8,6 +8,7 @@
 #include "Tools/zulm/StandardStreams.h"
 #include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
+#include "ZULMetaData/Containers/MovieDuration.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
@@ -22,9 +23,6 @@ using namespace ZULMetaData;
 using Json = nlohmann::ordered_json;
 
 namespace {
-
-/// The lengths from here on come from atoms that declare less than their own header.
-constexpr std::uint64_t s_negativeLength = std::uint64_t(1) << 63;
 
 struct AttachOptions {
     SaveOptions save;
@@ -45,12 +43,12 @@ struct Streams {
     ExitCode code = ExitFine;
 };
 
-uuid typeOfStreamFile(const std::string& path) {
+ByteSource openStreamFile(const std::string& path) {
     requireFile(path);
-    const RecognizedContainer recognized =
-        orFileError(path, [&path] { return recognizeContainer(ByteSource::file(path), path); });
+    const ByteSource stream = orFileError(path, [&path] { return ByteSource::file(path); });
+    const RecognizedContainer recognized = recognizeContainer(stream, path);
     if (recognized.type == Container::RawStream)
-        return openRecording(path).streams().front().type;
+        return stream;
     if (recognized.type == Container::Unknown)
         throw Failure(fmt::format("{}: not a stream file (.dat): it {}", path, recognized.refusal()));
     throw Failure(
@@ -60,15 +58,16 @@ uuid typeOfStreamFile(const std::string& path) {
 
 void takeStreamFiles(const AttachOptions& options, Streams& streams) {
     for (const std::string& path : options.streams) {
-        const uuid type = typeOfStreamFile(path);
-        if (std::filesystem::file_size(path) == 0) {
+        const ByteSource stream = openStreamFile(path);
+        if (stream.size() == 0) {
             complain(fmt::format("{}: is empty, as nothing was recorded into it; it was left out", path));
             streams.empty.push_back(path);
             streams.code = ExitDamaged;
             continue;
         }
-        streams.types.insert(type);
-        const StreamSource source = StreamSource::file(path);
+        if (const auto header = StreamEntries(stream).header())
+            streams.types.insert(header->uuid);
+        const StreamSource source = StreamSource::bytes(stream, path);
         streams.sources.push_back(options.unchecked ? source.unchecked() : source);
     }
 }
@@ -78,29 +77,13 @@ void complainAboutOldMovie(const std::string& path, const std::string& what, Str
     streams.code = ExitDamaged;
 }
 
-/// Where the children of a metadata atom or chunk do not end where it does, not all of them were found.
-bool hasUnreachableStreams(const Recording& recording) {
-    ItemWalk items(recording.bytes(), recording.container());
-    while (const auto item = items.next()) {
-        if (!item->holdsMetaData())
-            continue;
-        std::uint64_t end = item->payloadOffset();
-        ItemWalk children = items.inside(*item);
-        while (const auto child = children.next())
-            end = children.after(*child);
-        if (end != item->end())
-            return true;
-    }
-    return false;
-}
-
 void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
-    const Recording old = openRecording(options.from);
+    Recording old = openRecording(options.from);
     for (const StreamInfo& stream : old.streams()) {
         if (options.replace && streams.types.contains(stream.type))
             continue; // a stream file takes its place
         const std::string place = fmt::format("{} at offset {}", stream.name(), stream.offset);
-        if (stream.declaredBytes < s_metaDataHeaderSize || stream.declaredBytes >= s_negativeLength) {
+        if (!stream.hasRoom()) {
             complainAboutOldMovie(options.from, place + " lies in an atom without room for it", streams);
             continue;
         }
@@ -109,9 +92,10 @@ void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
                                   fmt::format("{} declares {} bytes, {} of which are there", place,
                                               stream.declaredBytes, stream.presentBytes),
                                   streams);
-        streams.sources.push_back(StreamSource::part(options.from, stream.offset, stream.declaredBytes).unchecked());
+        streams.sources.push_back(
+            StreamSource::bytes(old.bytes().part(stream.offset, stream.declaredBytes), options.from).unchecked());
     }
-    if (hasUnreachableStreams(old))
+    if (old.validation().hidesStreams())
         complainAboutOldMovie(options.from, "its metadata cannot be walked to the end", streams);
 }
 
@@ -199,7 +183,7 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     if (!options.from.empty())
         inputs.push_back(options.from);
     SaveTarget movie(options.save, inputs);
-    const auto duration = durationOfMovie(options.save.movie);
+    const auto duration = movieDuration(movie.movie(), Container::QuickTime);
     const std::string folder = std::filesystem::path(movie.name()).parent_path().string();
     const RetimedSources retimed(streams.sources, options.times, duration, folder);
     if (retimed.sources().empty())
@@ -207,11 +191,11 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     const auto existing = options.replace ? ExistingStreams::Supersede : ExistingStreams::Refuse;
     const auto index =
         options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd : SafeMovieSave::FragmentIndex::Leave;
-    const AttachPlan plan = movie.examine([&](const std::string& path) {
+    const AttachPlan plan = movie.planned([&](const ByteSource& bytes, const std::string& path) {
         AttachPlan examined(streams.sources, existing);
         if (options.times.changesTimes())
             examined = AttachPlan(retimed.sources(), existing);
-        orFileError(path, [&] { examined.requireFor(ByteSource::file(path), path); });
+        examined.requireFor(bytes, path);
         return examined;
     });
     const AttachResult attached =

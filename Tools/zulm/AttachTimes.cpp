@@ -89,10 +89,6 @@ ExitCode RetimedSources::complainAboutCuts() const {
     return cuts_.empty() ? ExitFine : ExitDamaged;
 }
 
-std::optional<double> durationOfMovie(const std::string& path) {
-    return orFileError(path, [&path] { return movieDuration(ByteSource::file(path), Container::QuickTime); });
-}
-
 std::uint64_t warnOfTimesOutside(const std::string& name, std::optional<double> duration,
                                  const std::vector<StreamSource>& sources) {
     const double end = duration.value_or(std::numeric_limits<double>::infinity());

@@ -51,9 +51,6 @@ private:
     std::uint64_t entriesRemoved_ = 0;
 };
 
-/// The movie's duration in seconds. Throws `FileError` if the file cannot be read.
-std::optional<double> durationOfMovie(const std::string& path);
-
 /// Warns if entries lie before the beginning or after the end of the movie `name`. Returns how many lie after it.
 std::uint64_t warnOfTimesOutside(const std::string& name, std::optional<double> duration,
                                  const std::vector<ZULMetaData::StreamSource>& sources);

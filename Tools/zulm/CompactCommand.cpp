@@ -5,12 +5,12 @@
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/MetaDataTail.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SaveTarget.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "ZULMetaDataBridge/Source/RecordingCompaction.h"
 
 #include <fmt/core.h>
 
@@ -55,27 +55,71 @@ std::unique_ptr<OutputFile> outputFor(const TailOptions& options) {
                                         options.save.force);
 }
 
+/// A copy that was made.
+struct Compaction {
+    const RecordingCompaction& result;
+    std::uint64_t sizeBefore;
+};
+
 Json streamDocument(const StreamInfo& stream) {
     return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}, {"bytes", stream.presentBytes}};
 }
 
-Json fileDocument(const TailOptions& options, const MetaDataTail& tail) {
+Json fileDocument(const TailOptions& options, const Compaction& done) {
     Json file = fileHeader(options.save.movie);
     addText(file, "output", options.name());
-    file.update(Json{{"bytes_before", tail.sizeBefore()},
-                     {"bytes_after", tail.sizeAfter()},
-                     {"streams_left_out", tail.streamsLeftOut()},
-                     {"creators_left_out", tail.creatorsLeftOut()},
+    file.update(Json{{"bytes_before", done.sizeBefore},
+                     {"bytes_after", done.result.sizeAfter()},
+                     {"streams_left_out", done.result.streamsLeftOut()},
+                     {"creators_left_out", done.result.creatorsLeftOut()},
                      {"streams", Json::array()}});
-    for (const StreamInfo& stream : tail.streams())
+    for (const StreamInfo& stream : done.result.streams())
         file["streams"].push_back(streamDocument(stream));
     return file;
 }
 
-void print(const TailOptions& options, const MetaDataTail& tail) {
+void print(const TailOptions& options, const Compaction& done) {
     writeOutput(fmt::format("{}: {} stream{} left out, {} kept; {} bytes became {}\n", shown(options.name()),
-                            tail.streamsLeftOut(), tail.streamsLeftOut() == 1 ? "" : "s", tail.streams().size(),
-                            tail.sizeBefore(), tail.sizeAfter()));
+                            done.result.streamsLeftOut(), done.result.streamsLeftOut() == 1 ? "" : "s",
+                            done.result.streams().size(), done.sizeBefore, done.result.sizeAfter()));
+}
+
+/// Throws `Failure` with what to do next.
+[[noreturn]] void fail(const CompactionError& error, const Recording& recording, const std::string& output) {
+    using Reason = CompactionError::Reason;
+    const std::string file = shellWord(recording.name());
+    switch (error.reason()) {
+    case Reason::Repairable:
+        throw Failure(
+            fmt::format("{}: {}; 'zulm repair {} -o OUT' mends it first", recording.name(), error.what(), file));
+    case Reason::Damaged:
+        throw Failure(fmt::format("{}: {}; 'zulm salvage {} -o DIR' searches it for metadata streams", recording.name(),
+                                  error.what(), file));
+    case Reason::UnreachableStream:
+        throw Failure(
+            fmt::format("{}: {}; 'zulm salvage {} -o DIR' writes them out", recording.name(), error.what(), file));
+    case Reason::CannotWrite: throw Failure(fmt::format("{}: {}", output, error.what()));
+    default: throw Failure(fmt::format("{}: {}", recording.name(), error.what()));
+    }
+}
+
+ExitCode writeCopy(const TailOptions& options, Recording& recording, RunReport& report) {
+    RecordingCompaction compaction(recording, options.kept);
+    if (compaction.streams().size() + compaction.streamsLeftOut() + compaction.creatorsLeftOut() == 0)
+        return complainAboutNothing(recording, {});
+    const std::unique_ptr<OutputFile> output = outputFor(options);
+    output->copyFrom(recording.path(), 0, compaction.copiedBytes());
+    compaction.complete(output->temporaryPath());
+    output->commit();
+    const Compaction done{compaction, recording.size()};
+    if (report.isWanted())
+        report.add(fileDocument(options, done));
+    else if (!settings().quiet)
+        print(options, done);
+    if (compaction.bytesCut() == 0)
+        return ExitFine;
+    complain(fmt::format("{}: left out {} bytes of incomplete entries", options.name(), compaction.bytesCut()));
+    return ExitDamaged;
 }
 
 ExitCode writeTail(const TailOptions& options, RunReport& report) {
@@ -84,21 +128,11 @@ ExitCode writeTail(const TailOptions& options, RunReport& report) {
     Recording recording = input.open();
     if (!options.save.inPlace)
         requireOutputName(options.save.output, recording.container(), input.path());
-    MetaDataTail tail(recording, options.kept);
-    const std::uint64_t streams = tail.streams().size() + tail.streamsLeftOut();
-    if (streams == 0 && tail.creatorsLeftOut() == 0)
-        return complainAboutNothing(recording, {});
-    const std::unique_ptr<OutputFile> output = outputFor(options);
-    tail.write(*output, options.name());
-    output->commit();
-    if (report.isWanted())
-        report.add(fileDocument(options, tail));
-    else if (!settings().quiet)
-        print(options, tail);
-    if (tail.bytesCut() == 0)
-        return ExitFine;
-    complain(fmt::format("{}: left out {} bytes of incomplete entries", options.name(), tail.bytesCut()));
-    return ExitDamaged;
+    try {
+        return writeCopy(options, recording, report);
+    } catch (const CompactionError& error) {
+        fail(error, recording, options.name());
+    }
 }
 
 ExitCode runTail(const TailOptions& options) {

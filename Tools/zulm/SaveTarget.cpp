@@ -6,6 +6,7 @@
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/TemporaryFile.h"
+#include "ZULMetaDataBridge/Source/FileError.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
@@ -41,9 +42,14 @@ std::string hexText(const std::string& bytes) {
     return text;
 }
 
-void requireRepairable(const std::string& path) {
+ByteSource openMovie(const std::string& path) {
+    requireFile(path);
+    return orFileError(path, [&] { return ByteSource::file(path); });
+}
+
+void requireRepairable(const ByteSource& movie, const std::string& path) {
     try {
-        const RepairPlan plan = SafeMovieSave(path).plan();
+        const RepairPlan plan = planSave(movie, path);
         if (plan.state == RepairPlan::Unrepairable)
             throw Failure(unrepairableText(path, plan));
     } catch (const SaveError& error) {
@@ -72,13 +78,13 @@ void requireDestination(const SaveOptions& options) {
 }
 
 SaveTarget::SaveTarget(const SaveOptions& options, const std::vector<std::string>& otherInputs)
-    : name_(options.inPlace ? options.movie : options.output), subject_(options.movie), path_(options.movie) {
-    requireFile(options.movie);
+    : name_(options.inPlace ? options.movie : options.output), subject_(options.movie), path_(options.movie),
+      movie_(openMovie(options.movie)) {
     if (!options.inPlace)
         requireOutputName(name_, Container::QuickTime, options.movie);
     if (options.inPlace)
         requireFile(options.movie, true);
-    requireRepairable(options.movie);
+    requireRepairable(movie_, options.movie);
     if (options.inPlace) {
         catchSignals();
         return;

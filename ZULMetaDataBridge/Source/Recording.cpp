@@ -42,15 +42,16 @@ ByteSource named(const ByteSource& bytes, const std::string& name) {
 
 } // namespace
 
-Recording::Recording(const FileLocation& file, std::string name)
-    : path_(utf8Path(file)), name_(name.empty() ? path_ : std::move(name)),
-      parser_(opened(name_, [this] { return openContainer(path_); })),
-      bytes_(orFileError(name_, [this] { return named(ByteSource::stream(parser_->getStream()), name_); })) {}
+Recording::Recording(const FileLocation& file, std::string name) : Recording(utf8Path(file), std::move(name), {}) {}
 
-Recording::Recording(ByteSource bytes, std::string name)
-    : name_(std::move(name)), input_(std::make_unique<ByteSourceStream>(bytes)),
-      parser_(opened(name_, [&] { return openContainer(*input_, recognizedType(bytes, name_)); })),
-      bytes_(named(bytes, name_)) {}
+Recording::Recording(ByteSource bytes, std::string name) : Recording({}, std::move(name), std::move(bytes)) {}
+
+Recording::Recording(std::string path, std::string name, std::optional<ByteSource> bytes)
+    : path_(std::move(path)), name_(name.empty() ? path_ : std::move(name)),
+      bytes_(named(bytes ? *bytes : orFileError(name_, [this] { return ByteSource::file(path_); }), name_)),
+      input_(std::make_unique<ByteSourceStream>(bytes_)), parser_(opened(name_, [this] {
+          return openContainer(*input_, recognizedType(bytes_, path_.empty() ? name_ : path_));
+      })) {}
 
 std::optional<double> Recording::duration() const {
     return movieDuration(bytes_, container());

@@ -36,6 +36,10 @@ struct StreamInfo {
 
     std::string name() const { return metaDataKindName(type); }      ///< its kind, or else its identifier
     bool isCutShort() const { return presentBytes < declaredBytes; } ///< returns true if the file ends too early
+
+    /// Returns false if the atom around the stream is smaller than its own header. Readers then take the size of the
+    /// stream for a huge number.
+    bool hasRoom() const { return declaredBytes >= s_metaDataHeaderSize && declaredBytes >> 63 == 0; }
 };
 
 /// Finds the streams once, when it is created, and then reads from the places that it found. Calls must not overlap.
@@ -93,11 +97,13 @@ public:
     }
 
 private:
+    Recording(std::string path, std::string name, std::optional<ByteSource> bytes);
+
     std::string path_;
     std::string name_;
-    std::unique_ptr<std::istream> input_; ///< what the parser reads, over bytes of the caller
-    std::unique_ptr<MetaDataParser> parser_;
     ByteSource bytes_;
+    std::unique_ptr<std::istream> input_; ///< what the parser reads
+    std::unique_ptr<MetaDataParser> parser_;
     std::optional<ValidationReport> validation_;
 };
 

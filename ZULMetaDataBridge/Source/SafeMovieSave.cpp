@@ -23,14 +23,13 @@ namespace {
 constexpr std::size_t s_pieceSize = 1 << 18;
 
 /// An empty file may yet become a movie; `repair` refuses it in words of its own.
-void requireMovie(const ByteSource& file, const FileLocation& movie) {
-    const RecognizedContainer recognized = recognizeContainer(file, utf8Path(movie));
+void requireMovie(const ByteSource& file, const std::string& name) {
+    const RecognizedContainer recognized = recognizeContainer(file, name);
     if (recognized.type == Container::QuickTime || file.size() == 0)
         return;
-    throw SaveError(utf8Path(movie), recognized.type == Container::Unknown ? recognized.refusal()
-                                     : recognized.type == Container::Riff
-                                         ? "is a RIFF file by its contents, not a movie"
-                                         : "is a stream file by its contents, not a movie");
+    throw SaveError(name, recognized.type == Container::Unknown ? recognized.refusal()
+                          : recognized.type == Container::Riff  ? "is a RIFF file by its contents, not a movie"
+                                                                : "is a stream file by its contents, not a movie");
 }
 
 /// Returns the streams that readers find in a movie.
@@ -82,7 +81,7 @@ AttachPlan::Stream measured(const StreamSource& source) {
 class Save {
 public:
     Save(const FileLocation& movie, const SafeMovieSave::Progress& progress)
-        : name_(utf8Path(movie)), progress_(progress), file_(movie), movie_(movie) {}
+        : name_(utf8Path(movie)), progress_(progress), file_(movie) {}
 
     RepairPlan repair();
     AttachResult attach(const AttachPlan& plan, SafeMovieSave::FragmentIndex index);
@@ -125,15 +124,13 @@ private:
     std::string name_;
     SafeMovieSave::Progress progress_;
     MovieFile file_;
-    FileLocation movie_;
     std::uint64_t done_ = 0;
     std::uint64_t total_ = 0;
 };
 
 RepairPlan Save::repair() {
     const ByteSource movie = file_.bytes();
-    requireMovie(movie, movie_);
-    RepairPlan plan = planRepair(movie);
+    RepairPlan plan = planSave(movie, name_);
     if (movie.size() == 0)
         fail("is empty");
     if (plan.state == RepairPlan::Unrepairable)
@@ -268,6 +265,13 @@ auto save(const FileLocation& movie, const SafeMovieSave::Progress& progress, Wo
 
 } // namespace
 
+RepairPlan planSave(const ByteSource& movie, const std::string& name) {
+    return naming(name, [&] {
+        requireMovie(movie, name);
+        return planRepair(movie);
+    });
+}
+
 AttachPlan::AttachPlan(const std::vector<StreamSource>& streams, ExistingStreams existing) : existing_(existing) {
     for (const StreamSource& source : streams) {
         streams_.push_back(naming(source.name(), [&] { return measured(source); }));
@@ -298,11 +302,8 @@ SafeMovieSave::SafeMovieSave(FileLocation movie, Progress progress)
     : movie_(std::move(movie)), progress_(std::move(progress)) {}
 
 RepairPlan SafeMovieSave::plan() const {
-    return naming(utf8Path(movie_), [this] {
-        const ByteSource movie = ByteSource::file(utf8Path(movie_));
-        requireMovie(movie, movie_);
-        return planRepair(movie);
-    });
+    const std::string name = utf8Path(movie_);
+    return planSave(naming(name, [&] { return ByteSource::file(name); }), name);
 }
 
 RepairPlan SafeMovieSave::repair() const {

@@ -108,6 +108,10 @@ private:
     ExistingStreams existing_;
 };
 
+/// Returns what a repair would do to a movie, and changes nothing. Throws `SaveError` if it is no movie or cannot be
+/// read. `name` is for messages.
+ZULMETADATA_API RepairPlan planSave(const ByteSource& movie, const std::string& name);
+
 /// Every operation takes the file for what `recognizeContainer` says and throws `SaveError` if it is no movie. It then
 /// repairs the movie as `planRepair` says, and throws `SaveError` if that cannot be done.
 /// What it appends reaches the disk before its size does, and is read back. Where anything fails, the repair included,

@@ -5,6 +5,7 @@
 #include "ZULMetaDataBridge/Source/Validation/ContainerWalk.h"
 
 #include <algorithm>
+#include <array>
 #include <stdexcept>
 
 namespace ZULMetaData {
@@ -20,6 +21,17 @@ std::vector<Finding> ValidationReport::allFindings() const {
     std::stable_sort(all.begin(), all.end(),
                      [](const Finding& left, const Finding& right) { return left.offset < right.offset; });
     return all;
+}
+
+bool ValidationReport::hidesStreams() const {
+    constexpr std::array codes{FindingCode::TrailingBytes, FindingCode::ZeroSizeChild, FindingCode::BeyondParent,
+                               FindingCode::BeyondFile,    FindingCode::DroppedTail,   FindingCode::OpenEndedAtom};
+    const auto isInMetaData = [&](const Finding& finding) {
+        return (finding.place == "ZULM" || finding.place == "DATA" || finding.code == FindingCode::ZeroSizeChild) &&
+               std::find(codes.begin(), codes.end(), finding.code) != codes.end();
+    };
+    return std::any_of(findings.begin(), findings.end(), isInMetaData) ||
+           std::any_of(streams.begin(), streams.end(), [](const StreamReport& stream) { return !stream.isReachable; });
 }
 
 ValidationReport validateRecording(const FileLocation& file, const std::set<FindingCode>& ignored) {

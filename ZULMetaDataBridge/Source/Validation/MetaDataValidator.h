@@ -195,6 +195,7 @@ struct ZULMETADATA_API ValidationReport {
 
     bool isDamaged() const { return damageCount > 0; }   ///< notices are no damage
     bool hasMetaData() const { return streamCount > 0; } ///< streams, whole or not
+    bool hidesStreams() const;                           ///< readers may miss streams, because a ZULM is damaged
     std::vector<Finding> allFindings() const;            ///< in the order of their offsets
 };
 
