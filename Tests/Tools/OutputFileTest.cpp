@@ -181,7 +181,11 @@ TEST_P(EndingSignalTest, LeavesNoFile) {
     options.environment = {{"TMPDIR", folder.path().string()}};
     options.input = tinyMovie() + atom("free", std::string(1 << 17, ' ')); // more than the tool reads at once
     options.keepsInputOpen = true;
-    options.killAfterMilliseconds = 300;
+    options.killAfterMilliseconds = 1;
+    options.killWhen = [&] {
+        const fs::directory_iterator files(folder.path());
+        return std::any_of(begin(files), end(files), [](const auto& entry) { return entry.file_size() > 0; });
+    };
     options.killSignal = GetParam();
     options.beforeKill = [&] {
         EXPECT_EQ(countFiles(), 1);

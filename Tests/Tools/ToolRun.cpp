@@ -147,7 +147,7 @@ private:
     bool mustStop() {
         const auto elapsed = Clock::now() - start_;
         if (options_.killAfterMilliseconds > 0 && !killed_ &&
-            elapsed > std::chrono::milliseconds(options_.killAfterMilliseconds)) {
+            elapsed > std::chrono::milliseconds(options_.killAfterMilliseconds) && options_.killWhen()) {
             options_.beforeKill();
             kill(child_, options_.killSignal);
             killed_ = true;

@@ -3,7 +3,7 @@
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/RunReport.h"
-#include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/SaveTarget.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "ZULMetaData/Containers/ContainerLayout.h"
@@ -198,7 +198,7 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     std::vector<std::string> inputs = options.streams;
     if (!options.from.empty())
         inputs.push_back(options.from);
-    SavedMovie movie(options.save, inputs);
+    SaveTarget movie(options.save, inputs);
     const auto duration = durationOfMovie(options.save.movie);
     const std::string folder = std::filesystem::path(movie.name()).parent_path().string();
     const RetimedSources retimed(streams.sources, options.times, duration, folder);

@@ -8,7 +8,7 @@
 #include "Tools/zulm/MetaDataTail.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/RunReport.h"
-#include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/SaveTarget.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 

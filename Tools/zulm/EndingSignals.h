@@ -2,6 +2,7 @@
 
 #include <array>
 #include <csignal>
+#include <cstddef>
 
 namespace Zulm {
 
@@ -10,11 +11,17 @@ namespace Zulm {
 inline constexpr std::array s_endingSignals{SIGHUP,  SIGINT,  SIGQUIT, SIGPIPE,   SIGALRM, SIGTERM,
                                             SIGUSR1, SIGUSR2, SIGXCPU, SIGVTALRM, SIGPROF, SIGIO};
 
-/// Sets the handler of all of them, except of those that the program was started to ignore.
+/// Sets the handler of all of them, except of those that the program was started to ignore or that another part of it
+/// handles, such as the library that fuzzes the commands.
 inline void handleEndingSignals(void (*handler)(int)) {
-    for (const int signal : s_endingSignals)
-        if (std::signal(signal, handler) == SIG_IGN)
-            std::signal(signal, SIG_IGN);
+    static std::array<bool, s_endingSignals.size()> isHandledHere{};
+    for (std::size_t i = 0; i < s_endingSignals.size(); ++i) {
+        const auto previous = std::signal(s_endingSignals[i], handler);
+        if (previous != SIG_DFL && !isHandledHere[i])
+            std::signal(s_endingSignals[i], previous);
+        else
+            isHandledHere[i] = handler != SIG_DFL;
+    }
 }
 
 } // namespace Zulm

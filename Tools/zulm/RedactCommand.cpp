@@ -7,7 +7,7 @@
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/RedactReport.h"
 #include "Tools/zulm/RunReport.h"
-#include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/SaveTarget.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/TextPattern.h"
 

@@ -1,6 +1,6 @@
 #include "Reports/Text.h"
 #include "Tools/zulm/RunReport.h"
-#include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/SaveTarget.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 
@@ -36,7 +36,7 @@ RepairPlan planFor(const std::string& movie) {
 Repair carryOut(const RepairOptions& options) {
     if (options.dryRun)
         return {planFor(options.save.movie), {}};
-    SavedMovie movie(options.save, {});
+    SaveTarget movie(options.save, {});
     return {movie.save("repairing " + movie.name(), [](const SafeMovieSave& save) { return save.repair(); }),
             movie.name()};
 }

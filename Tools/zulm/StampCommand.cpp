@@ -1,7 +1,7 @@
 #include "Reports/InfoReport.h"
 #include "Reports/Text.h"
 #include "Tools/zulm/RunReport.h"
-#include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/SaveTarget.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 
@@ -48,7 +48,7 @@ ExitCode complainAboutCut(const StampOptions& options, const CreatorAttributes& 
 }
 
 ExitCode stampMovie(const StampOptions& options, RunReport& report) {
-    SavedMovie movie(options.save, {});
+    SaveTarget movie(options.save, {});
     const StampResult stamped = movie.save("stamping " + movie.name(), [&](const SafeMovieSave& save) {
         return save.stamp(options.creator, options.version,
                           options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd

@@ -35,28 +35,31 @@ void requireDestination(const SaveOptions& options);
 
 /// The movie that a command works on: a copy that is put in its place when all is done, or the movie itself. While the
 /// movie itself is changed, a signal undoes that before it ends the program.
-class SavedMovie {
+class SaveTarget {
 public:
     /// Throws `Failure` for what is no movie or cannot be repaired, and where the output is one of the inputs.
-    SavedMovie(const SaveOptions& options, const std::vector<std::string>& otherInputs);
-    ~SavedMovie();
-    SavedMovie(const SavedMovie&) = delete;
-    SavedMovie& operator=(const SavedMovie&) = delete;
+    SaveTarget(const SaveOptions& options, const std::vector<std::string>& otherInputs);
+    ~SaveTarget();
+    SaveTarget(const SaveTarget&) = delete;
+    SaveTarget& operator=(const SaveTarget&) = delete;
 
     /// The file that the result is in.
     const std::string& name() const { return name_; }
 
-    /// Returns what `look` makes of the path of the movie, before anything is copied. Throws `Failure`.
-    template <class Look>
-    auto examine(Look look) const {
+    /// The movie as it is before anything is changed or copied, opened once.
+    const ZULMetaData::ByteSource& movie() const { return movie_; }
+
+    /// Returns what `plan` makes of the movie, before anything is copied. Throws `Failure` instead of `SaveError`.
+    template <class Plan>
+    auto planned(Plan plan) const {
         try {
-            return look(path_);
+            return plan(movie_, path_);
         } catch (const ZULMetaData::SaveError& error) {
             fail(error);
         }
     }
 
-    /// Gives what `work` makes of the `SafeMovieSave` of the movie or its copy, and puts the copy in place. Throws
+    /// Returns what `work` makes of the `SafeMovieSave` of the movie or its copy, and puts the copy in place. Throws
     /// `Failure`. Once only.
     template <class Work>
     auto save(const std::string& what, Work work) {
@@ -87,6 +90,7 @@ private:
     std::string name_;
     std::string subject_; ///< what messages call it
     std::string path_;    ///< of the movie, then of what is written to
+    ZULMetaData::ByteSource movie_;
     std::unique_ptr<OutputFile> copy_;
 };
 

@@ -1,10 +1,11 @@
-#include "Tools/zulm/SavedMovie.h"
+#include "Tools/zulm/SaveTarget.h"
 
 #include "Reports/Text.h"
 #include "Tools/zulm/EndingSignals.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/StandardStreams.h"
+#include "Tools/zulm/TemporaryFile.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
@@ -70,7 +71,7 @@ void requireDestination(const SaveOptions& options) {
         throw CLI::RequiredError("either -o OUT, which writes a changed copy, or --in-place, which changes MOVIE,");
 }
 
-SavedMovie::SavedMovie(const SaveOptions& options, const std::vector<std::string>& otherInputs)
+SaveTarget::SaveTarget(const SaveOptions& options, const std::vector<std::string>& otherInputs)
     : name_(options.inPlace ? options.movie : options.output), subject_(options.movie), path_(options.movie) {
     requireFile(options.movie);
     if (!options.inPlace)
@@ -87,12 +88,12 @@ SavedMovie::SavedMovie(const SaveOptions& options, const std::vector<std::string
     copy_ = std::make_unique<OutputFile>(options.output, inputs, options.force);
 }
 
-SavedMovie::~SavedMovie() {
+SaveTarget::~SaveTarget() {
     if (!copy_)
         releaseSignals();
 }
 
-SafeMovieSave::Progress SavedMovie::progress(const std::string& what) const {
+SafeMovieSave::Progress SaveTarget::progress(const std::string& what) const {
     auto shown = std::make_shared<std::unique_ptr<Progress>>();
     return [what, shown](std::uint64_t done, std::uint64_t total) {
         if (s_caught != 0)
@@ -103,7 +104,7 @@ SafeMovieSave::Progress SavedMovie::progress(const std::string& what) const {
     };
 }
 
-void SavedMovie::makeCopy() {
+void SaveTarget::makeCopy() {
     if (!copy_)
         return;
     copy_->copyFrom(path_);
@@ -111,12 +112,12 @@ void SavedMovie::makeCopy() {
     path_ = copy_->temporaryPath();
 }
 
-void SavedMovie::commit() {
+void SaveTarget::commit() {
     if (copy_)
         copy_->commit();
 }
 
-void SavedMovie::fail(const SaveError& error) const {
+void SaveTarget::fail(const SaveError& error) const {
     std::string text = fmt::format("{}: {}", error.file() == path_ ? subject_ : error.file(), error.sentence());
     if (error.reason() == SaveError::Reason::Doubtful)
         text += "; --unchecked attaches it as it is";
@@ -128,8 +129,9 @@ void SavedMovie::fail(const SaveError& error) const {
 }
 
 /// What was done is undone by now.
-void SavedMovie::endBy(const Interruption& interruption) const {
+void SaveTarget::endBy(const Interruption& interruption) const {
     complain(fmt::format("{}: interrupted; it is what it was before", name_));
+    removeTemporaryFiles();
     std::signal(interruption.signal, SIG_DFL);
     std::raise(interruption.signal);
     throw Failure(fmt::format("{}: interrupted", name_));
