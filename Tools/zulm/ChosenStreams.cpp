@@ -86,6 +86,15 @@ ExitCode complainAboutNothing(const Recording& recording, const std::vector<std:
     return ExitNoMetaData;
 }
 
+ExitCode complainAboutRest(const Recording& recording, const StreamInfo& stream, std::uint64_t end,
+                           const char* treated) {
+    if (end >= stream.declaredBytes)
+        return ExitFine;
+    complain(fmt::format("{}: {} cannot be {} from offset {} on; 'zulm verify {}' says more", recording.name(),
+                         stream.name(), treated, stream.offset + end, shellWord(recording.name())));
+    return ExitDamaged;
+}
+
 std::string streamFileIn(const std::string& folder, const uuid& type, std::size_t number) {
     const std::string suffix = number > 1 ? fmt::format("-{}", number) : "";
     return (std::filesystem::path(folder) / fmt::format("{}{}.dat", metaDataKindName(type), suffix)).string();

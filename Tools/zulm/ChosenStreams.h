@@ -6,6 +6,7 @@
 #include "ZULMetaDataBridge/Source/Recording.h"
 
 #include <cstddef>
+#include <cstdint>
 #include <string>
 #include <vector>
 
@@ -41,6 +42,11 @@ ZULMetaData::uuid typeNamed(const std::string& kind);
 
 /// Complains that there is nothing to work on: no metadata at all, or not of `kinds`.
 ExitCode complainAboutNothing(const ZULMetaData::Recording& recording, const std::vector<std::string>& kinds);
+
+/// Complains if a stream goes on after its first `end` bytes, which is as far as it could be `treated`: "read" or
+/// "searched". Returns how the command ends.
+ExitCode complainAboutRest(const ZULMetaData::Recording& recording, const ZULMetaData::StreamInfo& stream,
+                           std::uint64_t end, const char* treated = "read");
 
 /// FOLDER/NAME.dat, and FOLDER/NAME-2.dat and so on from the second on.
 std::string streamFileIn(const std::string& folder, const ZULMetaData::uuid& type, std::size_t number = 1);

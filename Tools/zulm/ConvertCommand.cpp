@@ -95,11 +95,7 @@ private:
     void complainAbout(const StreamInfo& stream, std::uint64_t end, const LeftOut& leftOut) {
         complainAbout(stream, leftOut.beforeStart, "before the beginning or at no time");
         complainAbout(stream, leftOut.atEnd, fmt::format("at the end, {} s, or after it", end_));
-        if (end < stream.declaredBytes)
-            complain(fmt::format("{}: {} cannot be read from offset {} on; 'zulm verify {}' says more",
-                                 recording_.name(), stream.name(), stream.offset + end, shellWord(recording_.name())));
-        if (end < stream.declaredBytes)
-            code_ = ExitDamaged;
+        code_ = worseOf(code_, complainAboutRest(recording_, stream, end));
     }
 
     void complainAbout(const StreamInfo& stream, std::uint64_t leftOut, const std::string& where) {

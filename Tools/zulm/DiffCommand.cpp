@@ -94,14 +94,7 @@ public:
 
     /// The number of bytes after the last entry that could be compared.
     std::uint64_t rest() const { return stream_.declaredBytes - end_; }
-
-    ExitCode complainAboutRest() const {
-        if (rest() == 0)
-            return ExitFine;
-        complain(fmt::format("{}: {} cannot be read from offset {} on; 'zulm verify {}' says more", recording_.name(),
-                             stream_.name(), stream_.offset + end_, shellWord(recording_.name())));
-        return ExitDamaged;
-    }
+    void complainAboutRest() const { Zulm::complainAboutRest(recording_, stream_, end_); }
 
 private:
     Recording& recording_;

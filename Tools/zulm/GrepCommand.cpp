@@ -77,11 +77,8 @@ private:
         std::uint64_t end = 0;
         if (entries.header() && isDecodable(*entries.header()))
             end = searchEntries<Value>(stream, entries);
-        if (end == stream.declaredBytes || isDone())
-            return;
-        isDamaged_ = true;
-        complain(fmt::format("{}: {} cannot be searched from offset {} on; 'zulm verify {}' says more", input_.name(),
-                             stream.name(), stream.offset + end, shellWord(input_.name())));
+        if (!isDone())
+            isDamaged_ |= complainAboutRest(recording_, stream, end, "searched") != ExitFine;
     }
 
     /// Returns the number of bytes that were searched.
