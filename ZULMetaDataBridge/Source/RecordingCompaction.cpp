@@ -16,7 +16,7 @@ namespace ZULMetaData {
 
 namespace {
 
-using Reason = CompactionError::Reason;
+using Obstacle = CompactionError::Reason;
 
 /// Larger items are not compared with one another.
 constexpr std::uint64_t s_mostCompared = 1 << 20;
@@ -44,8 +44,8 @@ std::string allOf(const ByteSource& source) {
     return bytes;
 }
 
-[[noreturn]] void failToWrite() {
-    throw CompactionError(Reason::CannotWrite,
+[[noreturn]] void failToComplete() {
+    throw CompactionError(Obstacle::CannotWrite,
                           "cannot be written: " + std::error_code(errno, std::generic_category()).message());
 }
 
@@ -54,7 +54,7 @@ std::string allOf(const ByteSource& source) {
 RecordingCompaction::RecordingCompaction(Recording& recording, KeptMetaData kept)
     : recording_(recording), kept_(kept), items_(topLevelItems(recording.bytes(), recording.container())) {
     if (recording_.container() == Container::RawStream)
-        throw CompactionError(Reason::NoContainer, "is a stream alone, without a movie around it");
+        throw CompactionError(Obstacle::NoContainer, "is a stream alone, without a movie around it");
     requireWholeContainer();
     findTail();
     chooseCreators();
@@ -72,17 +72,17 @@ std::uint64_t RecordingCompaction::copiedBytes() const {
 void RecordingCompaction::requireWholeContainer() const {
     const RepairPlan plan = isMovie() ? planRepair(recording_.bytes()) : RepairPlan();
     if (plan.state == RepairPlan::Repairable)
-        throw CompactionError(Reason::Repairable, plan.finding);
+        throw CompactionError(Obstacle::Repairable, plan.finding);
     const std::uint64_t end = items_.empty() ? 0 : items_.back().end();
     const bool fillsFile = end == recording_.size() || (!isMovie() && end + end % 2 == recording_.size());
     if (plan.state == RepairPlan::Unrepairable || !fillsFile)
-        throw CompactionError(Reason::Damaged, plan.finding.empty() ? "its parts do not fill the file" : plan.finding);
+        throw CompactionError(Obstacle::Damaged, plan.finding.empty() ? "its parts do not fill the file" : plan.finding);
 }
 
 void RecordingCompaction::requireReachableStreams() {
     const auto& streams = recording_.validation().streams;
     if (std::any_of(streams.begin(), streams.end(), [](const StreamReport& stream) { return !stream.isReachable; }))
-        throw CompactionError(Reason::UnreachableStream,
+        throw CompactionError(Obstacle::UnreachableStream,
                               "no reader finds some of its streams, and the copy would lose them");
 }
 
@@ -127,7 +127,7 @@ void RecordingCompaction::complete(const FileLocation& copy) {
     std::fstream out;
     fileOpen(out, utf8Path(copy).c_str(), std::ios::in | std::ios::out | std::ios::binary);
     if (!out.is_open())
-        failToWrite();
+        failToComplete();
     blankEarlierMetaData(out);
     out.seekp(static_cast<std::streamoff>(copiedBytes()));
     writeStreams(out);
@@ -136,12 +136,12 @@ void RecordingCompaction::complete(const FileLocation& copy) {
     const auto end = out.tellp();
     out.close();
     if (!out || end < 0)
-        failToWrite();
+        failToComplete();
     sizeAfter_ = static_cast<std::uint64_t>(end);
     std::error_code error;
     std::filesystem::resize_file(copy, sizeAfter_, error); // what was skipped at the end is zero
     if (error)
-        throw CompactionError(Reason::CannotWrite, "cannot be written: " + error.message());
+        throw CompactionError(Obstacle::CannotWrite, "cannot be written: " + error.message());
 }
 
 /// Metadata before the media leaves its place empty: the media may know the offsets of what follows.
@@ -172,7 +172,7 @@ void RecordingCompaction::writeStreams(std::ostream& out) {
     try {
         section.finish();
     } catch (const std::length_error& error) {
-        throw CompactionError(Reason::TooLarge, error.what());
+        throw CompactionError(Obstacle::TooLarge, error.what());
     }
 }
 
