@@ -28,17 +28,21 @@ PRECOMPILED = "#include <gmock/gmock.h>\n#include <gtest/gtest.h>\n"
 
 # The test programs that cover a source: the quickest or most telling first.
 READER = ["ZULMMetaDataReader", "MetaDataParser"]
-WRITER = ["ZULMMetaDataWriter", "CursorImageRecord"]
+WRITER = ["ZULMMetaDataWriter", "CursorImageWriter"]
 CONTAINERS = ["ContainerScan", "ParserUtil", "MetaDataParser"]
-CURSORS = ["CursorImageSchema", "CursorImageRecord", "StreamEntries", "ZULMMetaDataWriter"]
+CURSORS = ["CursorImageSchema", "CursorImageWriter", "StreamEntries", "ZULMMetaDataWriter"]
 COVERED_BY = {
     "AtomFormat.h": ["ContainerScan", "MP4MetaData", "AtomRepair"],
-    "AtomRepair.cpp": ["AtomRepair", "MetaDataParser"],
     "AtomWriting.cpp": ["MP4MetaData"],
+    "ByteReader.cpp": ["ByteSource", "StreamEntries"],
+    "ByteReader.h": ["ByteSource", "StreamEntries"],
+    "ByteSource.cpp": ["ByteSource"],
+    "ByteSource.h": ["ByteSource"],
+    "ByteSourceStream.cpp": ["ByteSource"],
     "ContainerLayout.cpp": ["ContainerLayout", "RecordingInfo"],
     "ContainerLayout.h": ["ContainerLayout", "RecordingInfo"],
     "ContainerRecognition.cpp": ["ContainerRecognition"],
-    "ContainerScan.cpp": [*CONTAINERS, "SmallAtoms"],
+    "ContainerScan.cpp": [*CONTAINERS, "PositionedInput"],
     "CursorImageSchema.cpp": CURSORS,
     "CursorImageSchema.h": CURSORS,
     "CursorImageSteps.h": CURSORS,
@@ -46,11 +50,12 @@ COVERED_BY = {
     "CursorImageWriter.h": CURSORS,
     "FileInputBuffer.cpp": ["FileInputBuffer", "MetaDataParser"],
     "FileInputBuffer.h": ["FileInputBuffer", "MetaDataParser"],
+    "FourCC.h": ["ContainerLayout", "ContainerScan"],
     "InvalidEntry.h": READER,
     "MP4MetaData.cpp": ["MP4MetaData"],
     "MovieDuration.cpp": ["MovieDuration"],
-    "PositionedInput.cpp": [*CONTAINERS, "AtomRepair", "MP4MetaData", "SmallAtoms"],
-    "PositionedInput.h": [*CONTAINERS, "AtomRepair", "MP4MetaData", "SmallAtoms"],
+    "PositionedInput.cpp": [*CONTAINERS, "AtomRepair", "MP4MetaData", "PositionedInput"],
+    "PositionedInput.h": [*CONTAINERS, "AtomRepair", "MP4MetaData", "PositionedInput"],
     "RecordingInfo.cpp": ["RecordingInfo"],
     "RepairPlan.cpp": ["RepairPlan"],
     "RepairPlan.h": ["RepairPlan"],
@@ -58,8 +63,8 @@ COVERED_BY = {
     "StreamBufferAccess.h": [*WRITER, *READER, "MP4MetaData"],
     "StreamEntries.cpp": ["StreamEntries", "StreamExtent"],
     "StreamEntries.h": ["StreamEntries", "StreamExtent"],
-    "StreamExtent.cpp": ["StreamExtent", "RepairPlan"],
-    "StreamExtent.h": ["StreamExtent", "RepairPlan"],
+    "Util.cpp": ["AtomRepair", "MetaDataParser"],
+    "WideRIFF.cpp": ["WideRIFF", "ContainerRecognition"],
     "ZULMMetaDataCommon.cpp": ["ValueTypes", "ZULMMetaDataCommon"],
     "ZULMMetaDataCommon.h": ["ValueTypes", "ZULMMetaDataCommon"],
     "ZULMMetaDataParser.cpp": ["MetaDataParser", "ParserUtil"],
@@ -85,9 +90,10 @@ class Tree:
         (self.objects / "tests.h").write_text(PRECOMPILED)
         subprocess.run([*COMPILE, "-x", "c++-header", self.objects / "tests.h"], check=True)
         self.library = [path.relative_to(self.root) for room in ("SharedDependencies", "ZULMetaData")
-                        for path in sorted((self.root / room).glob("*.cpp"))]
+                        for path in sorted((self.root / room).rglob("*.cpp"))]
         self.library += [pathlib.Path("Tests/Support/Files.cpp"), pathlib.Path("Tests/Support/MemoryWatch.cpp")]
-        self.tests = {name: pathlib.Path(f"Tests/ZULMetaData/{name}Test.cpp")
+        tests = self.root / "Tests/ZULMetaData"
+        self.tests = {name: next(tests.rglob(f"{name}Test.cpp")).relative_to(self.root)
                       for name in sorted({name for names in COVERED_BY.values() for name in names})}
         self.needs = {}
 
@@ -148,7 +154,7 @@ class Worker:
     def judge(self, mutant):
         """Whether a test notices; None where the mutant does not compile."""
         self.made = set()
-        changed = f"ZULMetaData/{mutant.file}"
+        changed = str(next((self.tree.root / "ZULMetaData").rglob(mutant.file)).relative_to(self.tree.root))
         source = (self.tree.root / changed).read_text()
         (self.overlay / changed).write_text(mutants.apply(mutant, source))
         try:
@@ -171,7 +177,7 @@ def lot(mutant):
 
 def all_mutants(tree):
     found = []
-    for file in sorted((tree.root / "ZULMetaData").glob("*.*")):
+    for file in sorted((tree.root / "ZULMetaData").rglob("*.*")):
         if file.suffix in (".h", ".cpp"):
             found += mutants.mutants(file.name, file.read_text())
     if unknown := {mutant.file for mutant in found} - set(COVERED_BY):
