@@ -156,6 +156,7 @@ class Worker:
         self.made = set()
         changed = str(next((self.tree.root / "ZULMetaData").rglob(mutant.file)).relative_to(self.tree.root))
         source = (self.tree.root / changed).read_text()
+        (self.overlay / changed).parent.mkdir(parents=True, exist_ok=True)
         (self.overlay / changed).write_text(mutants.apply(mutant, source))
         try:
             library = [self.object(file, changed) for file in self.tree.library]
