@@ -9,11 +9,8 @@
 
 #include <algorithm>
 #include <cmath>
-#include <iterator>
-#include <memory>
 #include <string_view>
 #include <utility>
-#include <variant>
 
 namespace Zulm {
 
@@ -71,17 +68,6 @@ std::string quoted(const std::string& bytes) {
     for (const char c : shown(bytes))
         text.append(c == '"' ? "\\" : "").append(1, c);
     return text += '"';
-}
-
-std::string csvText(std::string_view bytes) {
-    std::string text;
-    while (!bytes.empty()) {
-        const std::string_view line = bytes.substr(0, bytes.find('\n'));
-        bytes.remove_prefix(line.size());
-        text.append(shown(line)).append(bytes.substr(0, 1));
-        bytes.remove_prefix(std::min<std::size_t>(bytes.size(), 1));
-    }
-    return text;
 }
 
 std::string csvField(const std::string& text) {
@@ -173,7 +159,7 @@ std::string csvLine(const Json& entry, const EntryKeys& keys) {
             line += ',';
         const auto value = entry.find(key);
         if (value != entry.end() && !value->is_null())
-            line += csvField(value->is_string() ? csvText(bytesOf(entry, key)) : plain(*value));
+            line += csvField(value->is_string() ? shownLines(bytesOf(entry, key)) : plain(*value));
     }
     return line;
 }

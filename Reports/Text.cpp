@@ -130,6 +130,12 @@ std::string shown(std::string_view bytes) {
     });
 }
 
+std::string shownLines(std::string_view bytes) {
+    return eachShown(bytes, [](const TextPiece& piece, std::string_view) {
+        return piece.number == '\n' ? std::string("\n") : shown(piece.bytes);
+    });
+}
+
 std::string shownMessage(std::string_view message) {
     return eachShown(message, [](const TextPiece& piece, std::string_view following) {
         return piece.number == '\\' && looksLikeEscape(following) ? std::string("\\\\") : shownPiece(piece);

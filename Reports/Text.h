@@ -17,6 +17,9 @@ std::string printable(std::string_view bytes);
 /// byte that is not UTF-8, \u{N} for any other character, and \\ for a backslash.
 std::string shown(std::string_view bytes);
 
+/// Returns the same with the ends of lines as they are.
+std::string shownLines(std::string_view bytes);
+
 /// Returns a whole message with the same escapes. Its backslashes are doubled only if they would look like an escape
 /// otherwise, so that the commands in it (see `shellWord`) can be pasted into a shell.
 std::string shownMessage(std::string_view message);

@@ -124,15 +124,15 @@ const MetaDataKind& kindNamed(const std::string& name) {
     return *kind;
 }
 
-py::dtype typeOfEntries(const uuid& kind) {
+py::dtype typeOfEntries(const std::string& kind) {
     py::dtype type = py::dtype::of<double>();
-    RecordedKinds::visit(kind, [&type]<class Kind>() { type = entryType<Kind>(); });
+    RecordedKinds::visit(kindNamed(kind).type, [&type]<class Kind>() { type = entryType<Kind>(); });
     return type;
 }
 
-py::list coordinatesOf(const uuid& kind) {
+py::list coordinatesOf(const std::string& kind) {
     py::list names;
-    RecordedKinds::visit(kind, [&names]<class Kind>() {
+    RecordedKinds::visit(kindNamed(kind).type, [&names]<class Kind>() {
         using Value = typename Kind::Value;
         if constexpr (std::is_same_v<Value, Point> || std::is_same_v<Value, Rect> || std::is_same_v<Value, CursorImage>)
             visitNumbers<Kind>([&names]<class Number>(const char* key, Number) {

@@ -215,11 +215,9 @@ std::string keyText(std::uint32_t code, std::uint32_t flags) {
 }
 
 void addKinds(py::module_& module) {
-    module.def(
-        "dtype_of", [](const std::string& kind) { return typeOfEntries(kindNamed(kind).type); }, py::arg("kind"),
-        "Returns the fields of an entry of this kind. Raises `KeyError` for a kind without entries.");
-    module.def(
-        "coordinates_of", [](const std::string& kind) { return coordinatesOf(kindNamed(kind).type); }, py::arg("kind"));
+    module.def("dtype_of", typeOfEntries, py::arg("kind"),
+               "Returns the fields of an entry of this kind. Raises `KeyError` for a kind without entries.");
+    module.def("coordinates_of", coordinatesOf, py::arg("kind"));
     module.def(
         "recorded_kinds",
         [] {
