@@ -37,6 +37,7 @@ public:
 private:
     void write(std::string_view bytes);
 
+    /// Does `work`, and throws `FileError` if the stream fails.
     template <class Work>
     void checked(Work work);
 
