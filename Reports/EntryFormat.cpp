@@ -2,7 +2,6 @@
 
 #include "Platform/Image.h"
 #include "Reports/Number.h"
-#include "Reports/Report.h"
 #include "Reports/Text.h"
 
 #include <fmt/core.h>
@@ -10,11 +9,8 @@
 
 #include <algorithm>
 #include <cmath>
-#include <iterator>
-#include <memory>
 #include <string_view>
 #include <utility>
-#include <variant>
 
 namespace Zulm {
 
@@ -74,17 +70,6 @@ std::string quoted(const std::string& bytes) {
     return text += '"';
 }
 
-std::string csvText(std::string_view bytes) {
-    std::string text;
-    while (!bytes.empty()) {
-        const std::string_view line = bytes.substr(0, bytes.find('\n'));
-        bytes.remove_prefix(line.size());
-        text.append(shown(line)).append(bytes.substr(0, 1));
-        bytes.remove_prefix(std::min<std::size_t>(bytes.size(), 1));
-    }
-    return text;
-}
-
 std::string csvField(const std::string& text) {
     if (text.find_first_of(",\"\r\n") == std::string::npos)
         return text;
@@ -104,16 +89,8 @@ bool isShownInText(std::string_view key) {
 
 } // namespace
 
-void EntryDocument::add(const char* key, std::uint64_t value) {
-    document_[key] = std::to_string(value);
-}
-
 void EntryDocument::add(const char* key, float value) {
-    document_[key] = std::isfinite(value) ? Json(shortestNumber(value)) : numberDocument(value);
-}
-
-void EntryDocument::add(const char* key, double value) {
-    document_[key] = numberDocument(value);
+    add(key, std::isfinite(value) ? shortestNumber(value) : static_cast<double>(value));
 }
 
 void EntryDocument::add(const char* key, const CursorImage& cursor) {
@@ -129,28 +106,23 @@ void EntryDocument::addText(const char* key, const std::string& text, const std:
 
 void EntryDocument::addList(const std::vector<const char*>& keys, const std::list<std::string>& stored) {
     auto text = stored.begin();
-    for (const char* key : keys) {
-        if (text == stored.end())
+    for (const char* key : keys)
+        if (text == stored.end()) {
             document_[key] = nullptr;
-        else
+        } else {
             addText(key, utf8FromLatin1(*text), *text);
-        text = text == stored.end() ? text : std::next(text);
-    }
+            ++text;
+        }
     if (stored.size() < keys.size())
         further_[s_damage] = fmt::format("{} texts, fewer than its kind has", stored.size());
-    if (text != stored.end())
-        addFurther({text, stored.end()});
-}
-
-void EntryDocument::addFurther(const std::vector<std::string>& stored) {
-    Json texts;
+    bool isUTF8 = true;
     Json bytes;
-    for (const std::string& text : stored) {
-        texts.push_back(utf8FromLatin1(text));
-        bytes.push_back(base64(text));
+    for (; text != stored.end(); ++text) {
+        further_[s_further].push_back(utf8FromLatin1(*text));
+        bytes.push_back(base64(*text));
+        isUTF8 = isUTF8 && further_[s_further].back() == *text;
     }
-    further_[s_further] = texts;
-    if (texts != Json(stored))
+    if (!isUTF8)
         further_[s_further + std::string(s_storedSuffix)] = bytes;
 }
 
@@ -187,7 +159,7 @@ std::string csvLine(const Json& entry, const EntryKeys& keys) {
             line += ',';
         const auto value = entry.find(key);
         if (value != entry.end() && !value->is_null())
-            line += csvField(value->is_string() ? csvText(bytesOf(entry, key)) : plain(*value));
+            line += csvField(value->is_string() ? shownLines(bytesOf(entry, key)) : plain(*value));
     }
     return line;
 }

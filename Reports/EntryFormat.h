@@ -2,7 +2,7 @@
 
 // Decoded entries as JSON documents, and these as lines of text, NDJSON and CSV.
 
-#include "Reports/JsonWriter.h"
+#include "Reports/Report.h"
 #include "ZULMetaDataBridge/Source/EntryBuilding.h"
 #include "ZULMetaDataBridge/Source/StoredFields.h"
 
@@ -26,9 +26,10 @@ class EntryDocument {
 public:
     void add(const char* key, std::int32_t value) { document_[key] = value; }
     void add(const char* key, std::uint32_t value) { document_[key] = value; }
-    void add(const char* key, std::uint64_t value); ///< as text: more than a JSON number holds everywhere
+    /// As text: more than a JSON number holds everywhere.
+    void add(const char* key, std::uint64_t value) { document_[key] = std::to_string(value); }
     void add(const char* key, float value);
-    void add(const char* key, double value);
+    void add(const char* key, double value) { document_[key] = numberDocument(value); }
     void add(const char* key, const std::string& text) { addText(key, text, text); }
     void add(const char* key, const ZULMetaData::CursorImage& cursor);
 
@@ -41,8 +42,6 @@ public:
     nlohmann::ordered_json finished(double time);
 
 private:
-    void addFurther(const std::vector<std::string>& stored);
-
     nlohmann::ordered_json document_ = nlohmann::ordered_json::object();
     nlohmann::ordered_json further_ = nlohmann::ordered_json::object(); ///< what follows the fields
 };

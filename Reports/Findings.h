@@ -23,4 +23,7 @@ std::string damageIn(const ZULMetaData::StreamReport& stream);
 /// {"code": ..., "severity": "damage" or "notice", "place": ..., "offset": ..., "message": ...}
 nlohmann::ordered_json findingDocument(const ZULMetaData::Finding& finding);
 
+/// The file's object of `zulm verify --json`.
+nlohmann::ordered_json verifyDocument(const std::string& name, const ZULMetaData::ValidationReport& report);
+
 } // namespace Zulm

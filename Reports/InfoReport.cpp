@@ -47,14 +47,6 @@ std::string shownCreator(const CreatorAttributes& creator) {
     return fmt::format("{} {} on version {}", shown(name), shown(version), shown(platformVersion));
 }
 
-namespace {
-
-Json foreignDocument(const LayoutItem& atom) {
-    return {{"type", printable(atom.item.type.text())}, {"offset", atom.item.offset}, {"size", atom.size}};
-}
-
-} // namespace
-
 std::optional<double> entriesPerSecond(const StreamReport& stream) {
     if (!stream.firstTime || !stream.lastTime || stream.wholeEntries < 2)
         return std::nullopt;
@@ -79,21 +71,14 @@ void writeInfo(JsonWriter& writer, Recording& recording, const FileInfo& file) {
     writer.members({{"container", containerName(recording.container())},
                     {"bytes", recording.size()},
                     {"duration", numberDocument(file.duration)}});
-    writer.beginArray("streams");
-    for (const StreamReport& stream : file.streams)
-        writer.element(streamDocument(stream));
-    writer.end();
-    writer.beginArray("creators");
-    for (const ZCAPHeader& info : file.creators)
-        writer.element(creatorDocument(info.creator));
-    writer.end();
+    writer.array("streams", file.streams, streamDocument);
+    writer.array("creators", file.creators, [](const ZCAPHeader& info) { return creatorDocument(info.creator); });
     writer.beginArray("foreign_atoms");
-    visitForeignAtoms(recording, [&](const LayoutItem& atom) { writer.element(foreignDocument(atom)); });
+    visitForeignAtoms(recording, [&](const LayoutItem& atom) {
+        writer.element({{"type", printable(atom.item.type.text())}, {"offset", atom.item.offset}, {"size", atom.size}});
+    });
     writer.end();
-    writer.beginArray("warnings");
-    for (const Finding& finding : recording.validation().allFindings())
-        writer.element(findingDocument(finding));
-    writer.end();
+    writer.array("warnings", recording.validation().allFindings(), findingDocument);
     writer.end();
 }
 

@@ -42,6 +42,15 @@ public:
 
     void element(const nlohmann::ordered_json& value);
 
+    /// Writes a whole array: what `documentOf` returns for each item.
+    template <class Items, class DocumentOf>
+    void array(const std::string& name, const Items& items, DocumentOf documentOf) {
+        beginArray(name);
+        for (const auto& item : items)
+            element(documentOf(item));
+        end();
+    }
+
     /// Returns how many objects and arrays are open.
     std::size_t depth() const { return open_.size(); }
 

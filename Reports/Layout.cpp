@@ -13,76 +13,58 @@ using namespace ZULMetaData;
 
 namespace {
 
-class Walk {
-public:
-    Walk(const ByteSource& file, LayoutPart part, const LayoutVisitor& visitor)
-        : file_(file), part_(part), visitor_(visitor) {}
+LayoutItem entryFor(const ItemWalk& items, const ContainerItem& found, bool isInsideMetaData) {
+    LayoutItem entry;
+    entry.item = found;
+    entry.isOpenEnded = items.isMovie() && found.sizeField == 0;
+    entry.size = entry.isOpenEnded ? items.source().size() - found.offset : found.size;
+    entry.isMetaData = !isInsideMetaData && found.holdsMetaData() && !entry.isOpenEnded;
+    entry.isForeign = isInsideMetaData && !found.holdsStream();
+    if (isInsideMetaData && !entry.isForeign)
+        if (const auto header = StreamEntries(items.source().part(found.payloadOffset())).header())
+            entry.stream = header->uuid;
+    return entry;
+}
 
-    /// One list of items and the bytes that they should fill.
-    void run(ItemWalk items, bool isInsideMetaData) {
-        std::uint64_t position = items.position();
-        while (const auto found = items.next()) {
-            const LayoutItem item = entryFor(items, *found, isInsideMetaData);
-            show(items, item, isInsideMetaData);
-            if (const std::string reason = reasonToEnd(items, item, isInsideMetaData); !reason.empty())
-                return visitor_.end({found->offset, reason});
-            position = items.after(*found);
+/// Why nothing behind an item can be found; empty where something can.
+std::string reasonToEnd(const ItemWalk& items, const LayoutItem& entry, bool isInsideMetaData) {
+    const bool isMovie = items.isMovie();
+    const std::uint64_t left = items.end() - std::min(entry.item.offset, items.end());
+    const std::string name = fmt::format("{} '{}'", isMovie ? "atom" : "chunk", printable(entry.item.type.text()));
+    if (entry.isOpenEnded)
+        return fmt::format("{} is open-ended, as an interrupted recording leaves it; 'zulm repair' gives it its size",
+                           name);
+    if (isMovie && entry.size == 0)
+        return fmt::format("{} declares size 0, as an interrupted save leaves it; 'zulm repair' gives it its size",
+                           name);
+    if (entry.size < entry.item.headerSize)
+        return fmt::format("{} declares {} bytes, less than its header of {}", name, entry.size, entry.item.headerSize);
+    if (!isMovie && entry.item.sizeField == 0)
+        return fmt::format("{} has size 0, where the search for metadata ends", name);
+    if (entry.size > left)
+        return fmt::format("{} reaches {} bytes beyond the end of {}", name, entry.size - left,
+                           isInsideMetaData ? "the metadata" : "the file");
+    return {};
+}
+
+/// One list of items and the bytes that they should fill.
+void walk(ItemWalk items, LayoutPart part, const LayoutVisitor& visitor, bool isInsideMetaData) {
+    std::uint64_t position = items.position();
+    while (const auto found = items.next()) {
+        const LayoutItem item = entryFor(items, *found, isInsideMetaData);
+        if (isInsideMetaData || item.isMetaData || part == LayoutPart::Whole)
+            visitor.item(item, isInsideMetaData);
+        if (item.isMetaData) {
+            walk(items.inside(item.item), part, visitor, true);
+            visitor.childrenEnd();
         }
-        if (position < items.end())
-            visitor_.end(
-                {position, fmt::format("{} bytes are left, too few for another header", items.end() - position)});
+        if (const std::string reason = reasonToEnd(items, item, isInsideMetaData); !reason.empty())
+            return visitor.end({found->offset, reason});
+        position = items.after(*found);
     }
-
-private:
-    void show(const ItemWalk& items, const LayoutItem& item, bool isInsideMetaData) {
-        if (!isInsideMetaData && !item.isMetaData && part_ != LayoutPart::Whole)
-            return;
-        visitor_.item(item, isInsideMetaData);
-        if (!item.isMetaData)
-            return;
-        run(items.inside(item.item), true);
-        visitor_.childrenEnd();
-    }
-
-    LayoutItem entryFor(const ItemWalk& items, const ContainerItem& found, bool isInsideMetaData) const {
-        LayoutItem entry;
-        entry.item = found;
-        entry.isOpenEnded = items.isMovie() && found.sizeField == 0;
-        entry.size = entry.isOpenEnded ? file_.size() - found.offset : found.size;
-        entry.isMetaData = !isInsideMetaData && found.holdsMetaData() && !entry.isOpenEnded;
-        entry.isForeign = isInsideMetaData && !found.holdsStream();
-        if (isInsideMetaData && !entry.isForeign)
-            if (const auto header = StreamEntries(file_.part(found.payloadOffset())).header())
-                entry.stream = header->uuid;
-        return entry;
-    }
-
-    /// Why nothing behind an item can be found; empty where something can.
-    static std::string reasonToEnd(const ItemWalk& items, const LayoutItem& entry, bool isInsideMetaData) {
-        const bool isMovie = items.isMovie();
-        const std::uint64_t left = items.end() - std::min(entry.item.offset, items.end());
-        const std::string name = fmt::format("{} '{}'", isMovie ? "atom" : "chunk", printable(entry.item.type.text()));
-        if (entry.isOpenEnded)
-            return fmt::format(
-                "{} is open-ended, as an interrupted recording leaves it; 'zulm repair' gives it its size", name);
-        if (isMovie && entry.size == 0)
-            return fmt::format("{} declares size 0, as an interrupted save leaves it; 'zulm repair' gives it its size",
-                               name);
-        if (entry.size < entry.item.headerSize)
-            return fmt::format("{} declares {} bytes, less than its header of {}", name, entry.size,
-                               entry.item.headerSize);
-        if (!isMovie && entry.item.sizeField == 0)
-            return fmt::format("{} has size 0, where the search for metadata ends", name);
-        if (entry.size > left)
-            return fmt::format("{} reaches {} bytes beyond the end of {}", name, entry.size - left,
-                               isInsideMetaData ? "the metadata" : "the file");
-        return {};
-    }
-
-    const ByteSource& file_;
-    LayoutPart part_;
-    const LayoutVisitor& visitor_;
-};
+    if (position < items.end())
+        visitor.end({position, fmt::format("{} bytes are left, too few for another header", items.end() - position)});
+}
 
 } // namespace
 
@@ -93,7 +75,7 @@ std::string LayoutItem::headerForm() const {
 }
 
 void walkLayout(Recording& recording, LayoutPart part, const LayoutVisitor& visitor) {
-    Walk(recording.bytes(), part, visitor).run(ItemWalk(recording.bytes(), recording.container()), false);
+    walk(ItemWalk(recording.bytes(), recording.container()), part, visitor, false);
 }
 
 } // namespace Zulm

@@ -16,12 +16,11 @@ void beginReport(JsonWriter& writer, const std::string& command) {
 
 void endReport(JsonWriter& writer, const std::vector<ReportedError>& errors) {
     writer.endTo(1);
-    writer.beginArray("errors");
-    for (const ReportedError& error : errors) {
+    writer.array("errors", errors, [](const ReportedError& error) {
         Json document = fileHeader(error.path);
         document["message"] = error.message;
-        writer.element(document);
-    }
+        return document;
+    });
     writer.endTo(0);
 }
 

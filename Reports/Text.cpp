@@ -8,6 +8,7 @@
 #include <algorithm>
 #include <array>
 #include <cstddef>
+#include <cstdint>
 
 namespace Zulm {
 
@@ -46,6 +47,23 @@ std::uint32_t numberOf(std::string_view character) {
     for (const char c : character.substr(1))
         number = number << 6 | (static_cast<unsigned char>(c) & 0x3f);
     return number;
+}
+
+/// One character of a text, or one byte that belongs to no character.
+struct TextPiece {
+    std::string_view bytes;
+    std::uint32_t number = 0; ///< its code point, or the value of the byte
+    bool isCharacter = false; ///< false for a byte that is not UTF-8
+
+    bool canBeSeen() const { return isCharacter && !isInvisible(number); }
+};
+
+/// Returns what `bytes` begin with. They must not be empty.
+TextPiece firstPiece(std::string_view bytes) {
+    const std::size_t length = validCharacterLength(bytes);
+    if (length == 0)
+        return {bytes.substr(0, 1), static_cast<unsigned char>(bytes[0]), false};
+    return {bytes.substr(0, length), numberOf(bytes.substr(0, length)), true};
 }
 
 std::string escaped(char byte) {
@@ -99,17 +117,6 @@ bool isWhiteSpace(std::uint32_t number) {
 
 } // namespace
 
-bool TextPiece::canBeSeen() const {
-    return isCharacter && !isInvisible(number);
-}
-
-TextPiece firstPiece(std::string_view bytes) {
-    const std::size_t length = validCharacterLength(bytes);
-    if (length == 0)
-        return {bytes.substr(0, 1), static_cast<unsigned char>(bytes[0]), false};
-    return {bytes.substr(0, length), numberOf(bytes.substr(0, length)), true};
-}
-
 std::string printable(std::string_view bytes) {
     std::string text;
     for (const char c : bytes)
@@ -120,6 +127,12 @@ std::string printable(std::string_view bytes) {
 std::string shown(std::string_view bytes) {
     return eachShown(bytes, [](const TextPiece& piece, std::string_view) {
         return piece.number == '\\' ? std::string("\\\\") : shownPiece(piece);
+    });
+}
+
+std::string shownLines(std::string_view bytes) {
+    return eachShown(bytes, [](const TextPiece& piece, std::string_view) {
+        return piece.number == '\n' ? std::string("\n") : shown(piece.bytes);
     });
 }
 

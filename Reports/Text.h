@@ -5,22 +5,10 @@
 // Characters that cannot be seen are control characters, format characters such as those that turn the direction of
 // writing, separators of lines, fillers, and numbers that no character ever has.
 
-#include <cstdint>
 #include <string>
 #include <string_view>
 
 namespace Zulm {
-
-/// One character of a text, or one byte that belongs to no character.
-struct TextPiece {
-    std::string_view bytes;
-    std::uint32_t number = 0; ///< its code point, or the value of the byte
-    bool isCharacter = false; ///< false for a byte that is not UTF-8
-    bool canBeSeen() const;
-};
-
-/// Returns what `bytes` begin with. They must not be empty.
-TextPiece firstPiece(std::string_view bytes);
 
 /// Printable ASCII as it is, all else, and the backslash, as \xNN.
 std::string printable(std::string_view bytes);
@@ -28,6 +16,9 @@ std::string printable(std::string_view bytes);
 /// Returns the text with an escape for everything that cannot be seen: \xNN for an ASCII control character and for a
 /// byte that is not UTF-8, \u{N} for any other character, and \\ for a backslash.
 std::string shown(std::string_view bytes);
+
+/// Returns the same with the ends of lines as they are.
+std::string shownLines(std::string_view bytes);
 
 /// Returns a whole message with the same escapes. Its backslashes are doubled only if they would look like an escape
 /// otherwise, so that the commands in it (see `shellWord`) can be pasted into a shell.

@@ -5,7 +5,10 @@
 #include "Bindings/JavaScript/zulmetadata_c.h"
 #include "ZULMetaData/ZULMMetaDataCommon.h"
 
+#include <concepts>
+#include <cstddef>
 #include <cstdint>
+#include <span>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -13,47 +16,35 @@
 
 namespace ZULMetaData::Bindings {
 
-/// Texts or bytes, each kept once. Nearly all entries repeat what an earlier one said.
-class DistinctValues {
-public:
-    void add(std::string_view value);
-    void addNothing() { indices_.push_back(ZulmNothing); }
-
-    const std::vector<std::uint32_t>& indices() const { return indices_; }
-    const std::string& pool() const { return pool_; }
-    const std::vector<std::uint64_t>& ends() const { return ends_; }
-
-private:
-    std::vector<std::uint32_t> indices_;
-    std::string pool_;
-    std::vector<std::uint64_t> ends_;
-    std::unordered_map<std::string, std::uint32_t> numbers_;
-};
-
-/// Takes one type of value all along.
+/// Takes one type of value all along. Texts and bytes are kept once: nearly all entries repeat what an earlier one
+/// said.
 class EntryColumn {
 public:
     EntryColumn(const char* name, ZulmColumnType type) : name_(name), type_(type) {}
 
-    void add(std::int32_t value) { numbers_.push_back(value); }
-    void add(std::uint32_t value) { unsignedNumbers_.push_back(value); }
-    void add(std::uint64_t value) { identifiers_.push_back(value); }
+    template <class Number>
+    requires std::integral<Number> || std::same_as<Number, double>
+    void add(Number value) {
+        const auto bytes = std::as_bytes(std::span(&value, 1));
+        values_.insert(values_.end(), bytes.begin(), bytes.end());
+    }
+
     void add(float value);
-    void add(double value) { reals_.push_back(value); }
     void add(const std::string& text);
     void add(const CursorImage& cursor); ///< its encoded image
 
     /// Valid until something is added.
-    ZulmColumn view() const;
+    ZulmColumn view() const { return {name_, type_, values_.data(), pool_.data(), ends_.data(), ends_.size()}; }
 
 private:
+    void addDistinct(std::string_view value);
+
     const char* name_;
     ZulmColumnType type_;
-    std::vector<std::int32_t> numbers_;
-    std::vector<std::uint32_t> unsignedNumbers_;
-    std::vector<std::uint64_t> identifiers_;
-    std::vector<double> reals_;
-    DistinctValues values_;
+    std::vector<std::byte> values_; ///< the numbers as they lie in memory
+    std::string pool_;
+    std::vector<std::uint64_t> ends_;
+    std::unordered_map<std::string, std::uint32_t> places_; ///< among the distinct texts or bytes
 };
 
 } // namespace ZULMetaData::Bindings

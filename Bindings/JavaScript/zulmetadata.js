@@ -10,7 +10,8 @@ export class ZulmError extends Error {
 // As zulmetadata_c.h and WasmHost.cpp have them.
 const StreamField = { kind: 0, uuid: 4, version: 8, entries: 16, bytes: 24, offset: 32, first: 40, last: 48, isKnown: 56 };
 const ColumnField = { name: 0, type: 4, values: 8, pool: 12, ends: 16, distinct: 20 };
-const ColumnType = { Int32: 0, UInt64: 1, Real: 2, Texts: 3, Bytes: 4, UInt32: 5 };
+const NumberColumns = { 0: Int32Array, 1: BigUint64Array, 2: Float64Array, 5: Uint32Array };
+const TEXTS = 3;
 const NOTHING = 0xffffffff;
 
 const utf8 = new TextDecoder('utf-8', { ignoreBOM: true }); // a text keeps its first character
@@ -178,20 +179,10 @@ class Core {
     const field = (offset) => view.getUint32(offset, true);
     const name = this.textAt(field(ColumnField.name));
     const values = field(ColumnField.values);
-    switch (field(ColumnField.type)) {
-      case ColumnType.Int32:
-        return [name, this.copied(Int32Array, values, count)];
-      case ColumnType.UInt32:
-        return [name, this.copied(Uint32Array, values, count)];
-      case ColumnType.UInt64:
-        return [name, this.copied(BigUint64Array, values, count)];
-      case ColumnType.Real:
-        return [name, this.copied(Float64Array, values, count)];
-      case ColumnType.Texts:
-        return [name, this.#spread(values, count, this.#distinctAt(view, (bytes) => utf8.decode(bytes)))];
-      default:
-        return [name, this.#spread(values, count, this.#distinctAt(view, (bytes) => bytes.slice()))];
-    }
+    const type = field(ColumnField.type);
+    if (type in NumberColumns) return [name, this.copied(NumberColumns[type], values, count)];
+    const make = type === TEXTS ? (bytes) => utf8.decode(bytes) : (bytes) => bytes.slice();
+    return [name, this.#spread(values, count, this.#distinctAt(view, make))];
   }
 
   #distinctAt(column, make) {

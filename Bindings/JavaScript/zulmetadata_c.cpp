@@ -3,10 +3,10 @@
 #include "Bindings/JavaScript/BlockCache.h"
 #include "Bindings/JavaScript/EntryColumns.h"
 #include "Reports/DumpDocument.h"
+#include "Reports/Findings.h"
 #include "Reports/InfoReport.h"
 #include "Reports/JsonWriter.h"
 #include "Reports/Text.h"
-#include "Reports/VerifyReport.h"
 #include "ZULMetaDataBridge/Source/KeyCaptions.h"
 #include "ZULMetaDataBridge/Source/Recording.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
@@ -16,9 +16,9 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <concepts>
 #include <exception>
 #include <limits>
-#include <list>
 #include <memory>
 #include <new>
 #include <optional>
@@ -28,8 +28,6 @@
 #include <string>
 #include <string_view>
 #include <system_error>
-#include <tuple>
-#include <type_traits>
 #include <utility>
 #include <vector>
 
@@ -120,7 +118,7 @@ constexpr ZulmColumnType columnType() {
 
 /// Collects the entries of a stream.
 template <class Kind>
-void collect(Recording& recording, const StreamReport& stream, ZulmEntries& entries) {
+void collect(const Recording& recording, const StreamReport& stream, ZulmEntries& entries) {
     using Value = typename Kind::Value;
     ZULMetaData::detail::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
         entries.columns.emplace_back(key, columnType<Stored>());
@@ -141,48 +139,43 @@ const StreamReport& streamNamed(const ZulmRecording& opened, const std::string& 
     throw std::runtime_error(fmt::format("{}: holds no stream {}", opened.recording.name(), kind));
 }
 
-void requireDecodable(const ZulmRecording& opened, const StreamReport& stream) {
+/// Returns the columns that `collect` fills from the stream.
+template <class Collect>
+ZulmEntries* entriesOf(const ZulmRecording& opened, const StreamReport& stream, Collect collect) {
     if (!isDecodable(stream.header()))
         throw std::runtime_error(fmt::format("{}: entries of {}, version {}, cannot be decoded",
                                              opened.recording.name(), stream.name(), stream.version));
-}
-
-void addViews(ZulmEntries& entries) {
-    for (const EntryColumn& column : entries.columns)
-        entries.views.push_back(column.view());
-}
-
-std::unique_ptr<ZulmEntries> readEntries(ZulmRecording& opened, const StreamReport& stream) {
-    requireDecodable(opened, stream);
     auto entries = std::make_unique<ZulmEntries>();
-    RecordedKinds::visit(stream.type, [&]<class Kind>() { collect<Kind>(opened.recording, stream, *entries); });
-    addViews(*entries);
-    return entries;
+    collect(*entries);
+    for (const EntryColumn& column : entries->columns)
+        entries->views.push_back(column.view());
+    return entries.release();
 }
 
-/// One row for each key.
-std::unique_ptr<ZulmEntries> readKeyCaptions(ZulmRecording& opened, bool showsKeys) {
-    const StreamReport& stream = streamNamed(opened, metaDataKindName(KeyboardActionKind::type));
-    requireDecodable(opened, stream);
+ZulmEntries* readEntries(const ZulmRecording& opened, const StreamReport& stream) {
+    return entriesOf(opened, stream, [&](ZulmEntries& entries) {
+        RecordedKinds::visit(stream.type, [&]<class Kind>() { collect<Kind>(opened.recording, stream, entries); });
+    });
+}
+
+/// Collects one row for each key.
+void collectKeyCaptions(const Recording& recording, const StreamReport& stream, bool showsKeys, ZulmEntries& entries) {
     std::vector<KeyEvent> keys;
-    opened.recording.readEntries<KeyStroke>(stream, [&keys](double time, const KeyStroke& key) {
+    recording.readEntries<KeyStroke>(stream, [&keys](double time, const KeyStroke& key) {
         keys.push_back({time, key});
         return true;
     });
-    auto entries = std::make_unique<ZulmEntries>();
-    entries->columns = {{"label", ZulmTexts}, {"isTyped", ZulmInt32}, {"first", ZulmInt32}, {"end", ZulmReal}};
+    entries.columns = {{"label", ZulmTexts}, {"isTyped", ZulmInt32}, {"first", ZulmInt32}, {"end", ZulmReal}};
     for (const KeyCaption& caption : keyCaptions(std::move(keys), showsKeys)) {
-        const auto first = static_cast<std::int32_t>(entries->times.size());
+        const auto first = static_cast<std::int32_t>(entries.times.size());
         for (const CaptionKey& key : caption.keys) {
-            entries->times.push_back(key.time);
-            entries->columns[0].add(key.label);
-            entries->columns[1].add(std::int32_t{key.isTyped});
-            entries->columns[2].add(first);
-            entries->columns[3].add(caption.end);
+            entries.times.push_back(key.time);
+            entries.columns[0].add(key.label);
+            entries.columns[1].add(std::int32_t{key.isTyped});
+            entries.columns[2].add(first);
+            entries.columns[3].add(caption.end);
         }
     }
-    addViews(*entries);
-    return entries;
 }
 
 std::vector<StreamReport> streamsNamed(const ZulmRecording& opened, const char* kinds) {
@@ -259,15 +252,20 @@ const ZulmStream* zulm_hidden(const ZulmRecording* recording, size_t index) {
 }
 
 ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind) {
-    return orNull([&] { return readEntries(*recording, streamNamed(*recording, kind)).release(); });
+    return orNull([&] { return readEntries(*recording, streamNamed(*recording, kind)); });
 }
 
 ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index) {
-    return orNull([&] { return readEntries(*recording, recording->hidden[index].report).release(); });
+    return orNull([&] { return readEntries(*recording, recording->hidden[index].report); });
 }
 
 ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys) {
-    return orNull([&] { return readKeyCaptions(*recording, showsKeys != 0).release(); });
+    return orNull([&] {
+        const StreamReport& stream = streamNamed(*recording, metaDataKindName(KeyboardActionKind::type));
+        return entriesOf(*recording, stream, [&](ZulmEntries& entries) {
+            collectKeyCaptions(recording->recording, stream, showsKeys != 0, entries);
+        });
+    });
 }
 
 void zulm_free_entries(ZulmEntries* entries) {

@@ -2,11 +2,10 @@
 
 #include "Bindings/Python/PythonTexts.h"
 #include "ZULMetaData/StreamEntries.h"
-#include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
 
 #include <algorithm>
-#include <iterator>
+#include <array>
 #include <memory>
 #include <tuple>
 #include <utility>
@@ -16,47 +15,31 @@ namespace ZULMetaData::Python {
 
 namespace {
 
-template <class Value>
-constexpr const char* numberFormat() {
-    if constexpr (std::is_same_v<Value, std::int32_t>)
-        return "<i4";
-    else if constexpr (std::is_same_v<Value, std::uint32_t>)
-        return "<u4";
-    else if constexpr (std::is_same_v<Value, float>)
-        return "<f4";
-    else if constexpr (std::is_same_v<Value, double>)
-        return "<f8";
-    else
-        return nullptr; // a text, which only the kind's own entries are made of
-}
-
-template <class Kind>
-void addFields(py::list& fields) {
-    const auto add = [&fields]<class Projection>(const Field<Projection>& field) {
+/// Calls `visit` with the key of every stored number of an entry, and a number of its type.
+template <class Kind, class Visit>
+void visitNumbers(Visit visit) {
+    const auto visitNumber = [&visit]<class Projection>(const Field<Projection>& field) {
         using Result = std::decay_t<std::invoke_result_t<Projection, const typename Kind::Value&>>;
-        if constexpr (!FixedSizeValue<typename Kind::Value>)
-            fields.append(py::make_tuple(field.key, "O"));
-        else if constexpr (numberFormat<Result>() != nullptr)
-            fields.append(py::make_tuple(field.key, numberFormat<Result>()));
+        if constexpr (std::is_arithmetic_v<Result>)
+            visit(field.key, Result());
     };
-    std::apply([&add](const auto&... field) { (add(field), ...); }, Kind::fields);
-}
-
-template <>
-void addFields<CursorImageKind>(py::list& fields) {
-    fields.append(py::make_tuple("id", "<u8"));
-    fields.append(py::make_tuple("hotspotOffsetX", "<i4"));
-    fields.append(py::make_tuple("hotspotOffsetY", "<i4"));
-    fields.append(py::make_tuple("cursorTypeId", "<i4"));
-    fields.append(py::make_tuple("flags", "<u4"));
-    fields.append(py::make_tuple("image", "O"));
+    std::apply([&](const auto&... field) { (visitNumber(field), ...); }, Kind::fields);
 }
 
 template <class Kind>
 py::dtype entryType() {
     py::list fields;
-    fields.append(py::make_tuple("time", "<f8"));
-    addFields<Kind>(fields);
+    const auto add = [&fields](const char* key, const py::object& type) { fields.append(py::make_tuple(key, type)); };
+    add("time", py::dtype::of<double>());
+    visitNumbers<Kind>([&]<class Number>(const char* key, Number) { add(key, py::dtype::of<Number>()); });
+    if constexpr (std::is_same_v<Kind, CursorImageKind>) {
+        add("cursorTypeId", py::dtype::of<std::int32_t>());
+        add("flags", py::dtype::of<std::uint32_t>());
+        add("image", py::dtype("O"));
+    } else if constexpr (!FixedSizeValue<typename Kind::Value>) {
+        for (const char* key : std::apply([](const auto&... field) { return std::array{field.key...}; }, Kind::fields))
+            add(key, py::dtype("O"));
+    }
     return py::dtype::from_args(fields);
 }
 
@@ -92,44 +75,30 @@ std::vector<TimedValue<Value>> decodeAll(const ByteSource& stream) {
     return decoded;
 }
 
-/// Moves one field of all entries into its column.
-template <class Value, class ValueOf>
-void fillColumn(py::array& array, const char* name, const std::vector<TimedValue<Value>>& entries, ValueOf valueOf) {
-    py::list column(entries.size());
-    for (std::size_t i = 0; i < entries.size(); ++i)
-        column[i] = valueOf(entries[i].value);
-    array[py::str(name)] = column;
-}
-
-void fillColumns(py::array& array, const std::vector<TimedValue<std::string>>& entries) {
-    const py::object name = array.dtype().attr("names")[py::int_(1)];
-    fillColumn(array, name.cast<std::string>().c_str(), entries, pythonText);
+py::tuple rowOf(double time, const std::string& text, const py::dtype&) {
+    return py::make_tuple(time, pythonText(text));
 }
 
 /// A text that an entry lacks is None.
-void fillColumns(py::array& array, const std::vector<TimedValue<std::list<std::string>>>& entries) {
-    const py::tuple names = array.dtype().attr("names");
-    for (std::size_t column = 1; column < names.size(); ++column)
-        fillColumn(array, names[column].cast<std::string>().c_str(), entries,
-                   [column](const std::list<std::string>& texts) -> py::object {
-                       if (texts.size() < column)
-                           return py::none();
-                       return pythonText(*std::next(texts.begin(), static_cast<std::ptrdiff_t>(column) - 1));
-                   });
+py::tuple rowOf(double time, const std::list<std::string>& texts, const py::dtype& type) {
+    py::tuple row(py::len(type));
+    std::size_t column = 0;
+    row[column++] = time;
+    for (const std::string& text : texts)
+        if (column < row.size())
+            row[column++] = pythonText(text);
+    while (column < row.size())
+        row[column++] = py::none();
+    return row;
 }
 
-void fillColumns(py::array& array, const std::vector<TimedValue<CursorImage>>& entries) {
-    const auto field = [&](const char* name, auto valueOf) { fillColumn(array, name, entries, valueOf); };
-    field("id", [](const CursorImage& cursor) { return py::int_(cursor.uniqueId); });
-    field("hotspotOffsetX", [](const CursorImage& cursor) { return py::int_(cursor.hotspotOffsetX); });
-    field("hotspotOffsetY", [](const CursorImage& cursor) { return py::int_(cursor.hotspotOffsetY); });
-    field("cursorTypeId", [](const CursorImage& cursor) { return py::int_(static_cast<int>(cursor.cursorTypeId)); });
-    field("flags", [](const CursorImage& cursor) { return py::int_(static_cast<std::uint32_t>(cursor.flags)); });
-    field("image", [](const CursorImage& cursor) -> py::object {
-        if (!cursor.imageData || cursor.imageDataSize == 0)
-            return py::none();
-        return py::bytes(reinterpret_cast<const char*>(cursor.imageData), cursor.imageDataSize);
-    });
+py::tuple rowOf(double time, const CursorImage& cursor, const py::dtype&) {
+    py::object image = py::none();
+    if (cursor.imageData && cursor.imageDataSize > 0)
+        image = py::bytes(reinterpret_cast<const char*>(cursor.imageData), cursor.imageDataSize);
+    return py::make_tuple(time, cursor.uniqueId, cursor.hotspotOffsetX, cursor.hotspotOffsetY,
+                          static_cast<std::int32_t>(cursor.cursorTypeId), static_cast<std::uint32_t>(cursor.flags),
+                          image);
 }
 
 template <class Kind>
@@ -138,14 +107,11 @@ py::array entriesOfKind(const ByteSource& stream) {
     if constexpr (FixedSizeValue<Value>) {
         return arrayOverStream<Kind>(stream);
     } else {
-        const std::vector<TimedValue<Value>> entries = decodeAll<Value>(stream);
-        py::array array(entryType<Kind>(), static_cast<py::ssize_t>(entries.size()));
-        py::array_t<double> times(static_cast<py::ssize_t>(entries.size()));
-        std::transform(entries.begin(), entries.end(), times.mutable_data(),
-                       [](const TimedValue<Value>& entry) { return entry.time; });
-        array[py::str("time")] = times;
-        fillColumns(array, entries);
-        return array;
+        const py::dtype type = entryType<Kind>();
+        py::list rows;
+        for (const TimedValue<Value>& entry : decodeAll<Value>(stream))
+            rows.append(rowOf(entry.time, entry.value, type));
+        return py::module_::import("numpy").attr("array")(rows, type);
     }
 }
 
@@ -158,23 +124,21 @@ const MetaDataKind& kindNamed(const std::string& name) {
     return *kind;
 }
 
-py::dtype typeOfEntries(const uuid& kind) {
+py::dtype typeOfEntries(const std::string& kind) {
     py::dtype type = py::dtype::of<double>();
-    RecordedKinds::visit(kind, [&type]<class Kind>() { type = entryType<Kind>(); });
+    RecordedKinds::visit(kindNamed(kind).type, [&type]<class Kind>() { type = entryType<Kind>(); });
     return type;
 }
 
-py::list coordinatesOf(const uuid& kind) {
+py::list coordinatesOf(const std::string& kind) {
     py::list names;
-    RecordedKinds::visit(kind, [&names]<class Kind>() {
+    RecordedKinds::visit(kindNamed(kind).type, [&names]<class Kind>() {
         using Value = typename Kind::Value;
-        const auto add = [&names]<class Projection>(const Field<Projection>& field) {
-            using Result = std::decay_t<std::invoke_result_t<Projection, const Value&>>;
-            if constexpr (std::is_same_v<Result, std::int32_t>)
-                names.append(field.key);
-        };
         if constexpr (std::is_same_v<Value, Point> || std::is_same_v<Value, Rect> || std::is_same_v<Value, CursorImage>)
-            std::apply([&add](const auto&... field) { (add(field), ...); }, Kind::fields);
+            visitNumbers<Kind>([&names]<class Number>(const char* key, Number) {
+                if (std::is_same_v<Number, std::int32_t>)
+                    names.append(key);
+            });
     });
     return names;
 }

@@ -19,10 +19,10 @@ const MetaDataKind& kindNamed(const std::string& name);
 
 /// "time" and the stored fields, in the order in which they are stored; texts and images are objects. A record of
 /// numbers lies in memory as its entry does in the stream.
-py::dtype typeOfEntries(const uuid& kind);
+py::dtype typeOfEntries(const std::string& kind);
 
 /// Of its fields the coordinates: numbers of which the library's writers for applications cut fractions off.
-py::list coordinatesOf(const uuid& kind);
+py::list coordinatesOf(const std::string& kind);
 
 /// Returns every whole entry that fits the kind. Numbers stay where they were read to, in memory that the array keeps.
 /// Texts are whole; bytes in them that are not UTF-8 become lone surrogates. Throws `ValueError` for a stream whose

@@ -14,6 +14,7 @@
 #include <pybind11/stl.h>
 #include <pybind11/stl/filesystem.h>
 
+#include <memory>
 #include <optional>
 #include <utility>
 
@@ -33,13 +34,12 @@ Recording openRecording(const FileLocation& file) {
 }
 
 /// A stream of a recording, found when the recording was opened.
-struct RecordedStream {
+struct RecordedStream : StreamInfo {
     FileLocation file;
-    StreamInfo place;
     MetaDataHeader header;
 
     /// Opens the file when it is used.
-    StreamSource source() const { return StreamSource::part(file, place.offset, place.declaredBytes); }
+    StreamSource source() const { return StreamSource::part(file, offset, declaredBytes); }
 };
 
 /// What a recording was found to hold. It keeps no file open.
@@ -56,7 +56,7 @@ RecordingFile lookInto(const FileLocation& file) {
     for (const ZCAPHeader& info : recording.creators())
         found.creators.push_back(info.creator);
     for (const StreamInfo& stream : recording.streams())
-        found.streams.push_back({file, stream, recording.entriesOf(stream).header().value_or(MetaDataHeader())});
+        found.streams.push_back({stream, file, recording.entriesOf(stream).header().value_or(MetaDataHeader())});
     return found;
 }
 
@@ -130,19 +130,13 @@ void setSaveError(const py::handle& type, const SaveError& error) {
     PyErr_SetObject(type.ptr(), exception.ptr());
 }
 
-/// Lets Python catch `FileError` and `std::system_error` as `OSError`.
-void registerFileErrors() {
-    py::register_exception_translator([](std::exception_ptr thrown) {
-        py::tuple arguments;
-        try {
-            std::rethrow_exception(std::move(thrown));
-        } catch (const FileError& error) {
-            arguments = py::make_tuple(error.code().value(), error.code().message(), pathText(error.file()));
-        } catch (const std::system_error& error) {
-            arguments = py::make_tuple(error.code().value(), pathText(error.what()));
-        }
-        PyErr_SetObject(PyExc_OSError, arguments.ptr());
-    });
+void setOSError(const py::tuple& arguments) {
+    PyErr_SetObject(PyExc_OSError, arguments.ptr());
+}
+
+/// Returns a method that formats its object. The properties of the object are those of argument 0 of the format.
+auto formatted(const char* format) {
+    return [format](const py::object& self) { return py::str(format).format(self); };
 }
 
 void addErrors(py::module_& module) {
@@ -156,35 +150,36 @@ void addErrors(py::module_& module) {
         "kind. If `reason` is 'not-undone', the movie could not be restored.",
         PyExc_RuntimeError, unknown.ptr());
     module.attr("SaveError") = saveError;
-    registerFileErrors();
     py::register_exception_translator([](std::exception_ptr thrown) {
         try {
-            if (thrown)
-                std::rethrow_exception(std::move(thrown));
+            std::rethrow_exception(std::move(thrown));
         } catch (const SaveError& error) {
             setSaveError(saveError, error);
+        } catch (const FileError& error) {
+            setOSError(py::make_tuple(error.code().value(), error.code().message(), pathText(error.file())));
+        } catch (const std::system_error& error) {
+            setOSError(py::make_tuple(error.code().value(), pathText(error.what())));
         }
     });
+}
+
+template <std::string (CreatorAttributes::*text)() const>
+py::str creatorText(const CreatorAttributes& creator) {
+    return pythonText((creator.*text)());
 }
 
 void addReading(py::module_& module) {
     py::class_<RecordedStream>(module, "RecordedStream",
                                "A stream of a recording: its place in the file, its kind and its version.")
+        .def_property_readonly("kind", &RecordedStream::name, "The name of the kind, or its UUID if it has no name.")
         .def_property_readonly(
-            "kind", [](const RecordedStream& stream) { return stream.place.name(); },
-            "The name of the kind, or its UUID if it has no name.")
-        .def_property_readonly(
-            "uuid", [](const RecordedStream& stream) { return uuidText(stream.place.type); },
+            "uuid", [](const RecordedStream& stream) { return uuidText(stream.type); },
             "The identifier of the kind, as text.")
         .def_property_readonly(
             "version", [](const RecordedStream& stream) { return stream.header.version; },
             "The version of the entries.")
-        .def_property_readonly(
-            "offset", [](const RecordedStream& stream) { return stream.place.offset; },
-            "The position of the header in the file.")
-        .def_property_readonly(
-            "bytes", [](const RecordedStream& stream) { return stream.place.declaredBytes; },
-            "The size that the container declares, header included.")
+        .def_readonly("offset", &RecordedStream::offset, "The position of the header in the file.")
+        .def_readonly("bytes", &RecordedStream::declaredBytes, "The size that the container declares, header included.")
         .def_property_readonly(
             "is_decodable", [](const RecordedStream& stream) { return isDecodable(stream.header); },
             "True if `read` knows the kind and the version.")
@@ -195,10 +190,7 @@ void addReading(py::module_& module) {
             },
             "Returns the whole entries, as a NumPy array of records.")
         .def("raw", bytesOf, "Returns the bytes of the stream, header included.")
-        .def("__repr__", [](const RecordedStream& stream) {
-            return py::str("<RecordedStream {} version={} offset={} bytes={}>")
-                .format(stream.place.name(), stream.header.version, stream.place.offset, stream.place.declaredBytes);
-        });
+        .def("__repr__", formatted("<RecordedStream {0.kind} version={0.version} offset={0.offset} bytes={0.bytes}>"));
     py::class_<RecordingFile>(module, "RecordingFile")
         .def(py::init(&lookInto), py::arg("path"))
         .def_property_readonly("container",
@@ -207,20 +199,14 @@ void addReading(py::module_& module) {
         .def_readonly("creators", &RecordingFile::creators)
         .def_readonly("streams", &RecordingFile::streams);
     py::class_<CreatorAttributes>(module, "Creator", "A stamp of a movie: the name of the platform and two versions.")
-        .def_property_readonly(
-            "name", [](const CreatorAttributes& creator) { return pythonText(creator.name()); },
-            "The name of the platform: 'Mac', whatever the system was.")
-        .def_property_readonly(
-            "version", [](const CreatorAttributes& creator) { return pythonText(creator.version()); },
-            "The version of the application that made the recording.")
-        .def_property_readonly(
-            "platform_version", [](const CreatorAttributes& creator) { return pythonText(creator.platformVersion()); },
-            "The version of the operating system.")
-        .def("__repr__", [](const CreatorAttributes& creator) {
-            return py::str("<Creator {!r} version={!r} platform_version={!r}>")
-                .format(pythonText(creator.name()), pythonText(creator.version()),
-                        pythonText(creator.platformVersion()));
-        });
+        .def_property_readonly("name", creatorText<&CreatorAttributes::name>,
+                               "The name of the platform: 'Mac', whatever the system was.")
+        .def_property_readonly("version", creatorText<&CreatorAttributes::version>,
+                               "The version of the application that made the recording.")
+        .def_property_readonly("platform_version", creatorText<&CreatorAttributes::platformVersion>,
+                               "The version of the operating system.")
+        .def("__repr__",
+             formatted("<Creator {0.name!r} version={0.version!r} platform_version={0.platform_version!r}>"));
 }
 
 /// A key without a name is the character of its low 8 bits.
@@ -229,11 +215,9 @@ std::string keyText(std::uint32_t code, std::uint32_t flags) {
 }
 
 void addKinds(py::module_& module) {
-    module.def(
-        "dtype_of", [](const std::string& kind) { return typeOfEntries(kindNamed(kind).type); }, py::arg("kind"),
-        "Returns the fields of an entry of this kind. Raises `KeyError` for a kind without entries.");
-    module.def(
-        "coordinates_of", [](const std::string& kind) { return coordinatesOf(kindNamed(kind).type); }, py::arg("kind"));
+    module.def("dtype_of", typeOfEntries, py::arg("kind"),
+               "Returns the fields of an entry of this kind. Raises `KeyError` for a kind without entries.");
+    module.def("coordinates_of", coordinatesOf, py::arg("kind"));
     module.def(
         "recorded_kinds",
         [] {
@@ -259,14 +243,16 @@ void addKinds(py::module_& module) {
 void addWriting(py::module_& module) {
     py::class_<StreamWriter>(module, "StreamWriterFile")
         .def(py::init([](const FileLocation& file, const std::string& kind) {
-                 return StreamWriter::create(file, kindNamed(kind));
+                 return std::make_unique<StreamWriter>(file, kindNamed(kind));
              }),
              py::arg("path"), py::arg("kind"))
         .def("extend", &StreamWriter::extend, py::arg("entries"))
-        .def("flush", &StreamWriter::flush)
-        .def("close", &StreamWriter::close)
-        .def_property_readonly("closed", &StreamWriter::isClosed)
-        .def_property_readonly("entries_written", &StreamWriter::entriesWritten);
+        .def("flush", &StreamWriter::flush, "Passes the entries written so far to the operating system.")
+        .def("close", &StreamWriter::close, "Writes what is left and closes the file. May be called more than once.")
+        .def_property_readonly("closed", &StreamWriter::isClosed, "True after `close`.")
+        .def_property_readonly(
+            "entries_written", &StreamWriter::entriesWritten,
+            "The number of entries written since the file was created, those in the buffer included.");
     module.def(
         "write_stream",
         [](const FileLocation& file, const std::string& kind, const py::array& entries) {
@@ -315,10 +301,8 @@ void addSaving(py::module_& module) {
         .def_readonly("entries", &AttachedStream::entries, "The number of whole entries, which are now in the movie.")
         .def_readonly("bytes_cut", &AttachedStream::bytesCut,
                       "The number of bytes after the last whole entry, left out.")
-        .def("__repr__", [](const AttachedStream& stream) {
-            return py::str("<AttachedStream {} offset={} entries={} bytes_cut={}>")
-                .format(metaDataKindName(stream.type), stream.offset, stream.entries, stream.bytesCut);
-        });
+        .def("__repr__",
+             formatted("<AttachedStream {0.kind} offset={0.offset} entries={0.entries} bytes_cut={0.bytes_cut}>"));
     py::class_<AttachResult>(module, "Attached", "What `attach` did.")
         .def_readonly("repair", &AttachResult::repair, "The repair that was made first.")
         .def_readonly("streams", &AttachResult::streams, "The streams, in the order of the arguments.")
@@ -340,14 +324,8 @@ void addVerifying(py::module_& module) {
         .def_readonly("place", &Finding::place, "The kind of the stream, or the type of the atom.")
         .def_readonly("offset", &Finding::offset, "The position in the file.")
         .def_readonly("sentence", &Finding::sentence, "What was found, in a sentence with the numbers.")
-        .def("__str__",
-             [](const Finding& finding) {
-                 return finding.place + " at offset " + std::to_string(finding.offset) + ": " + finding.sentence;
-             })
-        .def("__repr__", [](const Finding& finding) {
-            return py::str("<Finding {} {} offset={}: {}>")
-                .format(ruleOf(finding.code).name, finding.place, finding.offset, finding.sentence);
-        });
+        .def("__str__", formatted("{0.place} at offset {0.offset}: {0.sentence}"))
+        .def("__repr__", formatted("<Finding {0.code} {0.place} offset={0.offset}: {0.sentence}>"));
     py::class_<StreamReport>(module, "StreamReport", "What `verify` says about one stream.")
         .def_property_readonly("kind", &StreamReport::name, "The name of the kind, or its UUID if it has no name.")
         .def_readonly("version", &StreamReport::version, "The version of the entries; -1 if the header is cut short.")
@@ -358,10 +336,7 @@ void addVerifying(py::module_& module) {
         .def_readonly("last_time", &StreamReport::lastTime,
                       "The time in seconds of the last entry whose time is finite, or None.")
         .def_readonly("is_reachable", &StreamReport::isReachable, "True if readers find the stream.")
-        .def("__repr__", [](const StreamReport& stream) {
-            return py::str("<StreamReport {} offset={} entries={}>")
-                .format(stream.name(), stream.offset, stream.wholeEntries);
-        });
+        .def("__repr__", formatted("<StreamReport {0.kind} offset={0.offset} entries={0.entries}>"));
     py::class_<ValidationReport>(module, "Report", "What `verify` says about a file.")
         .def_readonly("bytes", &ValidationReport::bytes, "The size of the file.")
         .def_readonly("streams", &ValidationReport::streams, "The streams, in the order of the file; at most 1000.")

@@ -1,19 +1,19 @@
 #include "Bindings/Python/StreamWriter.h"
 
 #include "Bindings/Python/PythonTexts.h"
-#include "ZULMetaData/StreamEntries.h"
+#include "SharedDependencies/EndianFile.h"
+#include "ZULMetaData/StreamBufferAccess.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/FileError.h"
-#include "ZULMetaDataBridge/Source/MetaDataKinds.h"
+#include "ZULMetaDataBridge/Source/KindEntries.h"
 
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
 #include <limits>
-#include <string_view>
+#include <sstream>
 #include <system_error>
 #include <utility>
-#include <vector>
 
 namespace ZULMetaData::Python {
 
@@ -56,102 +56,78 @@ CursorImage storedValue(const py::tuple& entry, const CursorImage*) {
             static_cast<CursorImage::CursorImageFlags>(entry[5].cast<std::uint32_t>())};
 }
 
-/// What is ready to be written, for values that are not of a fixed size.
-template <class Value>
-std::vector<TimedValue<Value>> storedEntries(const py::array& entries) {
-    std::vector<TimedValue<Value>> stored;
-    stored.reserve(static_cast<std::size_t>(entries.size()));
-    for (const py::handle entry : entries.attr("tolist")()) {
-        const auto fields = py::reinterpret_borrow<py::tuple>(entry);
-        stored.push_back({fields[0].template cast<double>(), storedValue(fields, static_cast<const Value*>(nullptr))});
-    }
-    return stored;
+/// Returns what the entries are in a stream of their kind. A record of numbers is an entry; others are put together in
+/// `encoded`.
+std::string_view storedBytes(const uuid& kind, const py::array& entries, std::string& encoded) {
+    std::string_view bytes(static_cast<const char*>(entries.data()), static_cast<std::size_t>(entries.nbytes()));
+    RecordedKinds::visit(kind, [&]<class Kind>() {
+        using Value = typename Kind::Value;
+        if constexpr (!FixedSizeValue<Value>) {
+            std::ostringstream stream;
+            stream.exceptions(std::ios_base::badbit); // there is no memory
+            for (const py::handle entry : entries.attr("tolist")()) {
+                const auto fields = py::reinterpret_borrow<py::tuple>(entry);
+                metaDataWrite<Value>(fields[0].template cast<double>(),
+                                     storedValue(fields, static_cast<const Value*>(nullptr)), stream, Kind::version);
+            }
+            bytes = encoded = std::move(stream).str();
+        }
+    });
+    return bytes;
 }
-
-/// A record is what an entry is.
-template <FixedSizeValue Value>
-const py::array& storedEntries(const py::array& entries) {
-    return entries;
-}
-
-template <class Kind>
-class KindStreamWriter final : public StreamWriter {
-public:
-    explicit KindStreamWriter(const FileLocation& file) : file_(file) {
-        errno = 0;
-        writer_.init(utf8Path(file), Kind::type, Kind::version);
-        throwUnlessHealthy();
-    }
-
-    void extend(const py::array& entries) override {
-        if (isClosed())
-            throw py::value_error("the writer is closed");
-        write(storedEntries<Value>(entries));
-        written_ += static_cast<std::uint64_t>(entries.size());
-    }
-
-    /// What `storedEntries` gave.
-    template <class Entries>
-    void write(const Entries& entries) {
-        errno = 0;
-        put(entries);
-        throwUnlessHealthy();
-    }
-
-    void flush() override {
-        errno = 0;
-        writer_.getStream().flush();
-        throwUnlessHealthy();
-    }
-
-    void close() override {
-        errno = 0;
-        writer_.close();
-        throwUnlessHealthy();
-    }
-
-    bool isClosed() const override { return !stream().is_open(); }
-
-    std::uint64_t entriesWritten() const override { return written_; }
-
-private:
-    using Value = typename Kind::Value;
-
-    const std::ofstream& stream() const { return const_cast<KindStreamWriter*>(this)->writer_.getStream(); }
-
-    void throwUnlessHealthy() const {
-        if (!stream().good())
-            throw FileError(utf8Path(file_), std::system_error(errno != 0 ? errno : EIO, std::generic_category()));
-    }
-
-    void put(const py::array& records) {
-        writer_.getStream().write(static_cast<const char*>(records.data()), records.nbytes());
-    }
-
-    void put(const std::vector<TimedValue<Value>>& entries) {
-        for (const TimedValue<Value>& entry : entries)
-            writer_.write(entry.time, entry.value, false);
-    }
-
-    FileLocation file_;
-    MetaDataWriter<Value, int, int> writer_;
-    std::uint64_t written_ = 0;
-};
 
 } // namespace
 
-std::unique_ptr<StreamWriter> StreamWriter::create(const FileLocation& file, const MetaDataKind& kind) {
-    std::unique_ptr<StreamWriter> writer;
-    RecordedKinds::visit(kind.type, [&]<class Kind>() { writer = std::make_unique<KindStreamWriter<Kind>>(file); });
-    return writer;
+template <class Work>
+void StreamWriter::checked(Work work) {
+    errno = 0;
+    work();
+    if (stream_.good())
+        return;
+    const int error = errno != 0 ? errno : EIO;
+    detail::StreamBufferAccess::discardPut(*stream_.rdbuf()); // closing would write part of it a second time
+    throw FileError(file_, std::system_error(error, std::generic_category()));
+}
+
+StreamWriter::StreamWriter(const FileLocation& file, const MetaDataKind& kind)
+    : file_(utf8Path(file)), kind_(kind.type) {
+    MetaDataHeader header{kind.type, kind.currentVersion, 0};
+    header.fixedEntrySize = entrySizeOf(header);
+    checked([&] {
+        fileOpen(stream_, file_.c_str(), std::ios_base::binary | std::ios_base::trunc);
+        stream_.write(reinterpret_cast<const char*>(&header), sizeof header);
+        stream_.flush();
+    });
 }
 
 void StreamWriter::writeFile(const FileLocation& file, const MetaDataKind& kind, const py::array& entries) {
-    RecordedKinds::visit(kind.type, [&]<class Kind>() {
-        const auto& stored = storedEntries<typename Kind::Value>(entries);
-        KindStreamWriter<Kind> writer(file);
-        writer.write(stored);
-        writer.close();
+    std::string encoded;
+    const std::string_view bytes = storedBytes(kind.type, entries, encoded);
+    StreamWriter writer(file, kind);
+    writer.write(bytes);
+    writer.close();
+}
+
+void StreamWriter::extend(const py::array& entries) {
+    if (isClosed())
+        throw py::value_error("the writer is closed");
+    std::string encoded;
+    write(storedBytes(kind_, entries, encoded));
+    written_ += static_cast<std::uint64_t>(entries.size());
+}
+
+void StreamWriter::write(std::string_view bytes) {
+    checked([&] { stream_.write(bytes.data(), static_cast<std::streamsize>(bytes.size())); });
+}
+
+void StreamWriter::flush() {
+    checked([this] { stream_.flush(); });
+}
+
+void StreamWriter::close() {
+    checked([this] {
+        if (!isClosed())
+            stream_.close();
     });
 }
 

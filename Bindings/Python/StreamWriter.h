@@ -9,34 +9,42 @@
 #include <pybind11/pybind11.h>
 
 #include <cstdint>
-#include <memory>
+#include <fstream>
+#include <string>
+#include <string_view>
 
 namespace ZULMetaData::Python {
 
 namespace py = pybind11;
 
-/// One of the kinds that `kindNamed` gives.
 class StreamWriter {
 public:
-    /// Creates or empties the file. Throws `OSError` where it cannot.
-    static std::unique_ptr<StreamWriter> create(const FileLocation& file, const MetaDataKind& kind);
+    /// Creates or empties the file. `kind` is one that `kindNamed` returns. Throws `OSError` if it cannot.
+    StreamWriter(const FileLocation& file, const MetaDataKind& kind);
 
     /// A whole file. Where `entries` do not fit, as for `extend`, nothing has been created or emptied.
     static void writeFile(const FileLocation& file, const MetaDataKind& kind, const py::array& entries);
 
-    StreamWriter() = default;
-    StreamWriter(const StreamWriter&) = delete;
-    StreamWriter& operator=(const StreamWriter&) = delete;
-    virtual ~StreamWriter() = default;
-
     /// Entries as `typeOfEntries` has them. Throws `TypeError` or `ValueError` for values that do not fit; nothing of
     /// `entries` has been written then. `OSError` where the disk takes no more, or the writer is closed.
-    virtual void extend(const py::array& entries) = 0;
+    void extend(const py::array& entries);
 
-    virtual void flush() = 0;
-    virtual void close() = 0;
-    virtual bool isClosed() const = 0;
-    virtual std::uint64_t entriesWritten() const = 0;
+    void flush();
+    void close();
+    bool isClosed() const { return !stream_.is_open(); }
+    std::uint64_t entriesWritten() const { return written_; }
+
+private:
+    void write(std::string_view bytes);
+
+    /// Does `work`, and throws `FileError` if the stream fails.
+    template <class Work>
+    void checked(Work work);
+
+    std::string file_;
+    uuid kind_;
+    std::ofstream stream_;
+    std::uint64_t written_ = 0;
 };
 
 } // namespace ZULMetaData::Python

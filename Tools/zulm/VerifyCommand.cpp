@@ -1,6 +1,5 @@
 #include "Reports/Findings.h"
 #include "Reports/Text.h"
-#include "Reports/VerifyReport.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"

@@ -1,9 +1,9 @@
 #include "Tools/zulm/ViewerPage.h"
 
+#include "Reports/Findings.h"
 #include "Reports/InfoReport.h"
 #include "Reports/Report.h"
 #include "Reports/Text.h"
-#include "Reports/VerifyReport.h"
 #include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 
 #include <fmt/core.h>

@@ -152,7 +152,7 @@ _SOURCE_TYPES = (str, os.PathLike, RecordedStream, Recording)
 _Source = Union[_Path, RecordedStream, Recording]
 
 
-class StreamWriter:
+class StreamWriter(_core.StreamWriterFile):
     """Writes a stream file, entry by entry. Close it at the end, or use it in a `with` statement.
 
         with StreamWriter("cursorLocation.dat", "cursorLocation") as writer:
@@ -172,7 +172,7 @@ class StreamWriter:
         self._fields = dtype_of(kind)
         self._coordinates = _core.coordinates_of(kind)
         self._name = f"{kind} {os.fspath(path)!r}"
-        self._file = _core.StreamWriterFile(os.fspath(path), kind)
+        super().__init__(os.fspath(path), kind)
 
     def append(self, time: float, *values: Any) -> None:
         """Writes one entry."""
@@ -185,25 +185,7 @@ class StreamWriter:
         """Writes many entries. They are tuples in a list, a generator or another iterable; or an array of records, whose
         fields have the names of `dtype_of(kind)` in any order; or rows of time and values, as an array of two dimensions
         or as lists. An iterable is read to its end before anything is written."""
-        self._file.extend(_records_of(entries, self._fields, self._coordinates))
-
-    def flush(self) -> None:
-        """Passes the entries written so far to the operating system."""
-        self._file.flush()
-
-    def close(self) -> None:
-        """Writes what is left and closes the file. May be called more than once."""
-        self._file.close()
-
-    @property
-    def closed(self) -> bool:
-        """True after `close`."""
-        return self._file.closed
-
-    @property
-    def entries_written(self) -> int:
-        """The number of entries written since the file was created, those in the buffer included."""
-        return self._file.entries_written
+        super().extend(_records_of(entries, self._fields, self._coordinates))
 
     def __repr__(self) -> str:
         return f"<StreamWriter {self._name} entries_written={self.entries_written}{': closed' if self.closed else ''}>"
