@@ -4,22 +4,19 @@
 #include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/RecordingInfo.h"
-#include "ZULMetaData/Containers/RepairPlan.h"
 #include "ZULMetaDataBridge/Source/MetaDataSection.h"
+#include "ZULMetaDataBridge/Source/RecordingCopy.h"
+#include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 #include "ZULMetaDataBridge/Source/Redaction/CopyCheck.h"
 #include "ZULMetaDataBridge/Source/Redaction/MediaCopy.h"
-#include "ZULMetaDataBridge/Source/Redaction/NullOutput.h"
 #include "ZULMetaDataBridge/Source/StreamSalvage.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <cstring>
-#include <filesystem>
 #include <fstream>
 #include <limits>
 #include <optional>
 #include <stdexcept>
-#include <system_error>
 #include <utility>
 
 namespace ZULMetaData {
@@ -28,58 +25,37 @@ namespace {
 
 using Reason = RedactionError::Reason;
 
-constexpr std::uint64_t s_most32 = std::numeric_limits<std::uint32_t>::max();
-
-template <std::size_t size>
-void writeBytes(std::ostream& out, const std::array<char, size>& bytes) {
-    out.write(bytes.data(), static_cast<std::streamsize>(size));
-}
-
-[[noreturn]] void failToWrite() {
-    throw RedactionError(Reason::CannotWrite, std::string("cannot be written: ") + std::strerror(errno));
-}
-
 /// A stream does not call itself failed if it cannot tell its position, and what is written then would stand in the
 /// wrong place.
 std::uint64_t offsetOf(std::ostream& out) {
     const auto position = out.tellp();
     if (position < 0)
-        failToWrite();
+        failToWrite<RedactionError>();
     return static_cast<std::uint64_t>(position);
-}
-
-/// The file ends where it was written or skipped to.
-void finish(std::ofstream& out, const FileLocation& file) {
-    const std::uint64_t end = offsetOf(out);
-    out.close();
-    if (!out)
-        failToWrite();
-    std::error_code error;
-    std::filesystem::resize_file(file, end, error);
-    if (error)
-        throw RedactionError(Reason::CannotWrite, "cannot be written: " + error.message());
-}
-
-std::uint64_t padded(std::uint64_t size) {
-    return size + size % 2;
 }
 
 } // namespace
 
 class RecordingRedactor::Work {
 public:
-    Work(std::istream& recording, Container::Type type, RecordingRedaction redaction, Progress progress);
+    Work(std::istream& recording, Container::Type type, RecordingRedaction redaction, Progress progress)
+        : redaction_(std::move(redaction)), progress_(std::move(progress)), parser_(openContainer(recording, type)),
+          file_(ByteSource::stream(recording)), total_(file_.size()) {
+        if (!progress_)
+            progress_ = [](Step, std::uint64_t, std::uint64_t) {};
+        streams_ = detail::streamsIn(*parser_, file_);
+        items_ = topLevelItems(file_, container());
+        media_ = detail::placesIn(file_, container());
+        choosePlaces();
+        mediaCopy_.emplace(file_, blanks_);
+    }
 
     bool isEmpty() const { return streams_.empty() && places_.empty(); }
 
     RedactedRecording preview() {
         prepare();
-        std::vector<RedactedStream> streams;
-        for (const detail::StreamPart& stream : streams_) {
-            detail::NullOutput nowhere;
-            streams.push_back(redact(stream, nowhere));
-        }
-        return result(std::move(streams));
+        std::ofstream nowhere; // is not open and drops everything
+        return result(redactAll(nowhere));
     }
 
     RedactedRecording write(const FileLocation& copy) {
@@ -87,9 +63,9 @@ public:
         std::ofstream out;
         fileOpen(out, utf8Path(copy).c_str(), std::ios::binary | std::ios::trunc);
         if (!out.is_open())
-            failToWrite();
+            failToWrite<RedactionError>();
         std::vector<RedactedStream> streams = writeContents(out);
-        finish(out, copy);
+        finishCopy<RedactionError>(out, copy);
         std::ifstream written;
         fileOpen(written, utf8Path(copy).c_str(), std::ios::binary);
         if (!written.is_open())
@@ -137,8 +113,7 @@ private:
             if (!item.holdsRecordingInfo())
                 continue;
             std::string head = item.payloadSize() >= neutral.size() ? neutral : std::string();
-            std::string stored(head.size(), '\0');
-            file_.read(item.payloadOffset(), stored);
+            const std::string stored = detail::readBytes(file_, item.payloadOffset(), head.size());
             if (item.payloadSize() > 0 && (stored != head || item.payloadSize() != head.size()))
                 addPlace(RedactedPlace::Creator, {{},
                                                   item.type.text(),
@@ -152,7 +127,7 @@ private:
         if (check_)
             return;
         if (container() != Container::RawStream)
-            requireWholeContainer();
+            requireWholeContainer<RedactionError>(file_, container(), items_);
         collectTexts();
         check_.emplace(redaction_, streamRedaction_, texts_);
         check_->requireNoTextStays(media_);
@@ -179,17 +154,6 @@ private:
                  {info.creator.name(), info.creator.version(), info.creator.platformVersion()})
                 if (!text.empty() && text != CreatorAttributes::platformNameMac())
                     texts_.removed.insert(text);
-    }
-
-    void requireWholeContainer() {
-        const RepairPlan plan = isMovie() ? planRepair(file_) : RepairPlan();
-        if (plan.state == RepairPlan::Repairable)
-            throw RedactionError(Reason::Repairable, plan.finding);
-        const std::uint64_t end = items_.empty() ? 0 : items_.back().end();
-        const bool fillsFile = end == total_ || (!isMovie() && padded(end) == total_);
-        if (plan.state == RepairPlan::Unrepairable || !fillsFile)
-            throw RedactionError(Reason::Damaged,
-                                 plan.finding.empty() ? "its parts do not fill the file" : plan.finding);
     }
 
     /// A stream in a place that is copied as it is would stay in the copy.
@@ -235,8 +199,12 @@ private:
     }
 
     std::vector<RedactedStream> writeContents(std::ostream& out) {
-        if (container() == Container::RawStream)
-            return writeStreamFile(out);
+        if (container() == Container::RawStream) {
+            std::vector<RedactedStream> streams = redactAll(out);
+            if (streams.empty() || streams.front().removal != RedactedStream::Kept)
+                throw RedactionError(Reason::NothingLeft, "nothing would be left of it");
+            return streams;
+        }
         writeMedia(out);
         try {
             return writeMetaData(out);
@@ -245,12 +213,10 @@ private:
         }
     }
 
-    std::vector<RedactedStream> writeStreamFile(std::ostream& out) const {
+    std::vector<RedactedStream> redactAll(std::ostream& out) const {
         std::vector<RedactedStream> streams;
         for (const detail::StreamPart& stream : streams_)
             streams.push_back(redact(stream, out));
-        if (streams.empty() || streams.front().removal != RedactedStream::Kept)
-            throw RedactionError(Reason::NothingLeft, "nothing would be left of it");
         return streams;
     }
 
@@ -273,10 +239,11 @@ private:
             done += bytes;
             progress_(Step::Copying, done, total_);
         };
+        const ByteSource media = mediaCopy_->bytes();
         for (std::size_t i = 0; i < items_.size(); ++i) {
             const ContainerItem& item = items_[i];
             if (!item.holdsMetaData())
-                mediaCopy_->copy(item.offset, item.size, out, advance);
+                appendBytes(media, item.offset, item.size, out, advance);
             else if (isBeforeMedia(i))
                 writeBlank(out, item);
             if (!isMovie())
@@ -286,12 +253,13 @@ private:
 
     void writeBlank(std::ostream& out, const ContainerItem& item) const {
         const auto end = static_cast<std::streamoff>(offsetOf(out) + item.size);
+        const auto write = [&out](const auto& header) { out.write(header.data(), header.size()); };
         if (!isMovie())
-            writeBytes(out, detail::chunkHeader(detail::s_junkChunk, static_cast<std::uint32_t>(item.payloadSize())));
-        else if (item.size > s_most32)
-            writeBytes(out, detail::extendedAtomHeader(detail::s_freeAtom, item.size));
+            write(detail::chunkHeader(detail::s_junkChunk, static_cast<std::uint32_t>(item.payloadSize())));
+        else if (item.size > std::numeric_limits<std::uint32_t>::max())
+            write(detail::extendedAtomHeader(detail::s_freeAtom, item.size));
         else
-            writeBytes(out, detail::atomHeader(detail::s_freeAtom, static_cast<std::uint32_t>(item.size)));
+            write(detail::atomHeader(detail::s_freeAtom, static_cast<std::uint32_t>(item.size)));
         out.seekp(end);
     }
 
@@ -312,19 +280,6 @@ private:
     std::optional<detail::CopyCheck> check_;
     std::uint64_t unreachable_ = 0;
 };
-
-RecordingRedactor::Work::Work(std::istream& recording, Container::Type type, RecordingRedaction redaction,
-                              Progress progress)
-    : redaction_(std::move(redaction)), progress_(std::move(progress)), parser_(openContainer(recording, type)),
-      file_(ByteSource::stream(recording)), total_(file_.size()) {
-    if (!progress_)
-        progress_ = [](Step, std::uint64_t, std::uint64_t) {};
-    streams_ = detail::streamsIn(*parser_, file_);
-    items_ = topLevelItems(file_, container());
-    media_ = detail::placesIn(file_, container());
-    choosePlaces();
-    mediaCopy_.emplace(file_, blanks_);
-}
 
 RecordingRedactor::RecordingRedactor(std::istream& recording, Container::Type type, RecordingRedaction redaction,
                                      Progress progress)

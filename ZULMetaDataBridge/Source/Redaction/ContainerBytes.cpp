@@ -42,10 +42,14 @@ bool isZero(std::string_view bytes) {
     return bytes.front() == 0 && std::memcmp(bytes.data(), bytes.data() + 1, bytes.size() - 1) == 0;
 }
 
-std::string readBytes(const ByteSource& file, std::uint64_t offset, std::uint64_t size, std::uint64_t limit) {
-    std::string bytes(static_cast<std::size_t>(std::min(size, limit)), '\0');
-    bytes.resize(file.read(offset, bytes));
+std::string readAll(const ByteSource& source) {
+    std::string bytes(static_cast<std::size_t>(source.size()), '\0');
+    bytes.resize(source.read(0, bytes));
     return bytes;
+}
+
+std::string readBytes(const ByteSource& file, std::uint64_t offset, std::uint64_t size, std::uint64_t limit) {
+    return readAll(file.part(offset, std::min(size, limit)));
 }
 
 std::uint64_t bigEndianAt(std::string_view bytes, std::size_t offset, std::size_t size) {

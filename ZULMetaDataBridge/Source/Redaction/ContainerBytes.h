@@ -27,8 +27,12 @@ bool isOneOf(FourCC type, const std::array<FourCC, size>& types) {
 /// Returns whether all bytes are zero; there must be at least one.
 bool isZero(std::string_view bytes);
 
+/// Returns all bytes that the source has, which must be few.
+std::string readAll(const ByteSource& source);
+
 /// Returns fewer bytes at the end of the file, and at most `limit`.
-std::string readBytes(const ByteSource& file, std::uint64_t offset, std::uint64_t size, std::uint64_t limit);
+std::string readBytes(const ByteSource& file, std::uint64_t offset, std::uint64_t size,
+                      std::uint64_t limit = s_longestRead);
 
 /// Returns 0 if the bytes do not reach that far.
 ///@{

@@ -1,18 +1,8 @@
 #include "ZULMetaDataBridge/Source/Redaction/MediaCopy.h"
 
-#include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
-
 #include <algorithm>
-#include <cerrno>
-#include <system_error>
 
 namespace ZULMetaData::detail {
-
-namespace {
-
-constexpr std::size_t s_mediaPiece = 1 << 20;
-
-} // namespace
 
 MediaCopy::MediaCopy(ByteSource file, std::vector<Blank> blanks) : file_(std::move(file)) {
     std::stable_sort(blanks.begin(), blanks.end(), [](const Blank& left, const Blank& right) {
@@ -30,23 +20,12 @@ bool MediaCopy::isKept(std::uint64_t offset) const {
                         [offset](const Blank& blank) { return blank.offset <= offset && offset < blank.end(); });
 }
 
-void MediaCopy::copy(std::uint64_t offset, std::uint64_t size, std::ostream& out,
-                     const std::function<void(std::uint64_t)>& advance) const {
-    std::vector<char> piece(s_mediaPiece);
-    const std::uint64_t end = offset + size;
-    while (offset < end) {
-        const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(end - offset, piece.size()));
-        const std::span<char> bytes(piece.data(), file_.read(offset, {piece.data(), wanted}));
-        if (bytes.empty())
-            throw std::system_error(EIO, std::generic_category(), "it ends at offset " + std::to_string(offset));
-        blank(offset, bytes);
-        if (isZero({bytes.data(), bytes.size()}))
-            out.seekp(static_cast<std::streamoff>(bytes.size()), std::ios::cur);
-        else
-            out.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
-        offset += bytes.size();
-        advance(bytes.size());
-    }
+ByteSource MediaCopy::bytes() const {
+    return {file_.size(), [this](std::uint64_t position, std::span<char> bytes) {
+                const std::size_t size = file_.read(position, bytes);
+                blank(position, bytes.first(size));
+                return size;
+            }};
 }
 
 void MediaCopy::blank(std::uint64_t offset, std::span<char> bytes) const {

@@ -120,7 +120,7 @@ private:
     }
 
     std::string payloadOf(const ContainerItem& item) {
-        return readBytes(movie_, item.payloadOffset(), item.payloadSize(), s_longestRead);
+        return readBytes(movie_, item.payloadOffset(), item.payloadSize());
     }
 
     void visitTop(const ContainerItem& item) {
@@ -128,8 +128,7 @@ private:
         if (item.type == "mdat")
             mediaData_.push_back(item);
         isFragmented_ = isFragmented_ || item.type == "moof";
-        const bool isXMP =
-            item.type == "uuid" && readBytes(movie_, item.payloadOffset(), s_xmp.size(), s_xmp.size()) == s_xmp;
+        const bool isXMP = item.type == "uuid" && readBytes(movie_, item.payloadOffset(), s_xmp.size()) == s_xmp;
         if (isXMP)
             addTags(item, path);
         else if (isOneOf(item.type, s_topTypes))
@@ -244,7 +243,7 @@ private:
         MediaPlace place = blankedAtom(MediaPlace::Use::Text, track.path, track.atom);
         std::vector<std::string> texts;
         visitSamples(track, movie_, [&](const SampleRange& sample) {
-            const auto found = textsOfSample(readBytes(movie_, sample.offset, sample.size, s_longestRead));
+            const auto found = textsOfSample(readBytes(movie_, sample.offset, sample.size));
             texts.insert(texts.end(), found.begin(), found.end());
             place.blanks.push_back({sample.offset, sample.size, {}});
             return true;

@@ -51,7 +51,7 @@ private:
     void visitList(const ContainerItem& item, const std::string& path, int depth) {
         ItemWalk children = chunks_.inside(item);
         children.moveTo(item.payloadOffset() + s_formSize);
-        const std::string formText = readBytes(file_, item.payloadOffset(), s_formSize, s_formSize);
+        const std::string formText = readBytes(file_, item.payloadOffset(), s_formSize);
         const FourCC form(static_cast<std::uint32_t>(bigEndianAt(formText, 0, s_formSize)));
         const std::string place = item.type == "LIST" ? path + ' ' + formText : path;
         if (form == "movi" || depth >= s_deepestLevel)
@@ -75,7 +75,7 @@ private:
 
     /// A chunk of a list of texts, and "strn", is one text; a label of a list "adtl" has the number of its mark before.
     void addTextsOf(const ContainerItem& item, const std::string& path) {
-        const std::string payload = readBytes(file_, item.payloadOffset(), item.payloadSize(), s_longestRead);
+        const std::string payload = readBytes(file_, item.payloadOffset(), item.payloadSize());
         const bool isLabel = item.type == "labl" || item.type == "note";
         const bool isText = isLabel || item.type == "strn" || path.find("LIST INFO/") != std::string::npos;
         std::vector<std::string> texts =
