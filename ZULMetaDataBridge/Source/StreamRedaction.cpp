@@ -34,7 +34,7 @@ constexpr TimeRole roleOf() {
 /// The times that a redaction removes, as ranges that neither overlap nor touch.
 class RemovedTimes {
 public:
-    RemovedTimes(std::vector<TimeRange> ranges) {
+    explicit RemovedTimes(std::vector<TimeRange> ranges) {
         std::erase_if(ranges, [](const TimeRange& range) { return !(range.from <= range.to); });
         std::sort(ranges.begin(), ranges.end(),
                   [](const auto& left, const auto& right) { return left.from < right.from; });
@@ -47,11 +47,9 @@ public:
     }
 
     /// Returns whether an entry of this time goes. An entry whose time is not a number may be of any time.
-
     bool isRemoved(double time) const { return !ranges_.empty() && (std::isnan(time) || rangeAt(time)); }
 
     /// Returns the range that holds the time, or null.
-
     const TimeRange* rangeAt(double time) const {
         const auto found = std::find_if(ranges_.begin(), ranges_.end(),
                                         [time](const auto& range) { return range.from <= time && time <= range.to; });
@@ -59,7 +57,6 @@ public:
     }
 
     /// Returns whether a removed time is at or after `begin` and before `end`.
-
     bool meets(double begin, double end) const {
         return std::any_of(ranges_.begin(), ranges_.end(),
                            [=](const auto& range) { return begin <= range.to && range.from < end; });
@@ -282,15 +279,6 @@ void writeHeader(const MetaDataHeader& header, std::ostream& out) {
     out.write(reinterpret_cast<const char*>(&header), sizeof header);
 }
 
-/// Calls `visit` with each entry and its bytes until it returns false. Returns where the walk ended.
-template <class Visit>
-std::uint64_t walk(StreamEntries& entries, Visit visit) {
-    while (const auto entry = entries.next())
-        if (!visit(*entry, entries.bytesOf(*entry)))
-            return entry->offset;
-    return entries.wholeBytes();
-}
-
 /// Calls `visit` with each decoded entry of a stream of texts or of lists of texts.
 template <class Visit>
 void visitTexts(StreamEntries& entries, Visit visit) {
@@ -299,7 +287,7 @@ void visitTexts(StreamEntries& entries, Visit visit) {
     RecordedKinds::visit(entries.header()->uuid, [&]<class Kind>() {
         using Value = typename Kind::Value;
         if constexpr (OneOf<Value, std::string, std::list<std::string>>)
-            walk(entries, [&](const StreamEntry&, std::string_view bytes) {
+            walkEntries(entries, [&](const StreamEntry&, std::string_view bytes) {
                 const auto decoded = decodeEntry<Value>(bytes, entries.header()->version);
                 if (decoded)
                     visit(*decoded);
@@ -326,7 +314,7 @@ std::set<std::string> textsHeldInside(const ByteSource& stream, const Redaction&
 void reportRemovedStream(StreamEntries& entries, const Redaction& redaction) {
     if (!redaction.onEntry || !entries.header() || !isDecodable(*entries.header()))
         return;
-    walk(entries, [&](const StreamEntry&, std::string_view bytes) {
+    walkEntries(entries, [&](const StreamEntry&, std::string_view bytes) {
         const auto time = timeOfEntry(*entries.header(), bytes);
         if (time)
             redaction.onEntry({RedactedEntry::Removed, *entries.header(), *time, bytes});
@@ -372,13 +360,13 @@ RedactedStream redactStream(const ByteSource& stream, const Redaction& redaction
     std::uint64_t end = s_metaDataHeaderSize;
     const bool isWalked = isDecodable(result.header) && RecordedKinds::visit(result.header.uuid, [&]<class Kind>() {
                               EntryRedactor<Kind> redactor(redaction, heldTexts, stream, result, out);
-                              end = walk(entries, [&](const StreamEntry& entry, std::string_view bytes) {
+                              end = walkEntries(entries, [&](const StreamEntry& entry, std::string_view bytes) {
                                   return redactor.copy(entry, bytes);
                               });
                               redactor.finish();
                           });
     if (!isWalked)
-        end = walk(entries, [&](const StreamEntry&, std::string_view bytes) {
+        end = walkEntries(entries, [&](const StreamEntry&, std::string_view bytes) {
             out.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
             ++result.entries;
             return true;
