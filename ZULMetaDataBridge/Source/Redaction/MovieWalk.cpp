@@ -93,12 +93,12 @@ std::uint64_t childrenOf(const ContainerItem& item, std::string_view payload) {
     return item.end();
 }
 
-class MovieWalk {
+class MovieWalk : PlaceWalk {
 public:
-    explicit MovieWalk(const ByteSource& movie) : movie_(movie), atoms_(movie, Container::QuickTime) {}
+    explicit MovieWalk(const ByteSource& movie) : PlaceWalk(movie, Container::QuickTime) {}
 
     MediaPlaces run() {
-        ItemWalk atoms = atoms_;
+        ItemWalk atoms = items_;
         while (const auto atom = atoms.next())
             if (!atom->holdsMetaData() && !atom->holdsRecordingInfo())
                 visitTop(*atom);
@@ -112,15 +112,11 @@ private:
     /// Passes over a child that does not lie inside its parent.
     template <class Visit>
     void forEachChild(const ContainerItem& parent, std::uint64_t begin, Visit visit) {
-        ItemWalk children = atoms_.inside(parent);
+        ItemWalk children = items_.inside(parent);
         children.moveTo(begin);
         while (const auto child = children.next())
             if (child->size >= child->headerSize && child->fits(parent.end()))
                 visit(*child);
-    }
-
-    std::string payloadOf(const ContainerItem& item) {
-        return readBytes(movie_, item.payloadOffset(), item.payloadSize());
     }
 
     void visitTop(const ContainerItem& item) {
@@ -128,7 +124,7 @@ private:
         if (item.type == "mdat")
             mediaData_.push_back(item);
         isFragmented_ = isFragmented_ || item.type == "moof";
-        const bool isXMP = item.type == "uuid" && readBytes(movie_, item.payloadOffset(), s_xmp.size()) == s_xmp;
+        const bool isXMP = item.type == "uuid" && readBytes(file_, item.payloadOffset(), s_xmp.size()) == s_xmp;
         if (isXMP)
             addTags(item, path);
         else if (isOneOf(item.type, s_topTypes))
@@ -179,8 +175,7 @@ private:
             for (std::size_t at = 0; at + 4 <= ids.size(); at += 4)
                 chapterTracks_.insert(bigEndianAt(ids, at, 4));
             const bool isOnlyChild = child.size == item.payloadSize();
-            places_.places.push_back(isOnlyChild ? blankedAtom(MediaPlace::Use::Text, path, item)
-                                                 : blankedAtom(MediaPlace::Use::Text, path + "/chap", child));
+            addPlace(MediaPlace::Use::Text, isOnlyChild ? item : child, isOnlyChild ? path : path + "/chap");
         });
     }
 
@@ -203,13 +198,8 @@ private:
                                   {{item.payloadOffset() + nameOffset, item.payloadSize() - nameOffset, {}}}});
     }
 
-    void addUnused(const ContainerItem& item, const std::string& path) {
-        if (!isBlank(movie_, item))
-            places_.places.push_back(blankedAtom(MediaPlace::Use::Unused, path, item));
-    }
-
     void addTags(const ContainerItem& item, const std::string& path) {
-        places_.places.push_back(blankedAtom(MediaPlace::Use::Text, path, item));
+        addPlace(MediaPlace::Use::Text, item, path);
         addTextsOf(item, path, 0);
     }
 
@@ -240,10 +230,10 @@ private:
             obstacle = whyNotRemovable(track);
         if (!obstacle.empty())
             return places_.obstacles.push_back({track.path, track.atom.offset, obstacle});
-        MediaPlace place = blankedAtom(MediaPlace::Use::Text, track.path, track.atom);
+        MediaPlace place = blanked(MediaPlace::Use::Text, track.atom, track.path);
         std::vector<std::string> texts;
-        visitSamples(track, movie_, [&](const SampleRange& sample) {
-            const auto found = textsOfSample(readBytes(movie_, sample.offset, sample.size));
+        visitSamples(track, file_, [&](const SampleRange& sample) {
+            const auto found = textsOfSample(readBytes(file_, sample.offset, sample.size));
             texts.insert(texts.end(), found.begin(), found.end());
             place.blanks.push_back({sample.offset, sample.size, {}});
             return true;
@@ -258,8 +248,8 @@ private:
         if (isFragmented_)
             return "has its texts in fragments";
         constexpr std::uint64_t most = 1 << 20; // nobody reads more texts
-        const auto isBounded = [this] { return textSamples_ <= most && textBytes_ <= movie_.size(); };
-        const bool isKnown = visitSamples(track, movie_, [&](const SampleRange& sample) {
+        const auto isBounded = [this] { return textSamples_ <= most && textBytes_ <= file_.size(); };
+        const bool isKnown = visitSamples(track, file_, [&](const SampleRange& sample) {
             textBytes_ += sample.size;
             ++textSamples_;
             return isBounded();
@@ -269,7 +259,7 @@ private:
 
     std::string whyNotRemovable(const MovieTrack& track) {
         std::vector<SampleRange> samples;
-        visitSamples(track, movie_, [&samples](const SampleRange& sample) {
+        visitSamples(track, file_, [&samples](const SampleRange& sample) {
             samples.push_back(sample);
             return true;
         });
@@ -294,7 +284,7 @@ private:
         for (const MovieTrack& other : tracks_) {
             if (other.atom.offset == track.atom.offset)
                 continue;
-            visitSamples(other, movie_, [&](const SampleRange& sample) {
+            visitSamples(other, file_, [&](const SampleRange& sample) {
                 const auto after = ends.lower_bound(sample.offset + sample.size);
                 isShared = sample.size > 0 && after != ends.begin() && std::prev(after)->second > sample.offset;
                 return !isShared;
@@ -305,18 +295,8 @@ private:
         return isShared;
     }
 
-    void addTexts(MediaText::Role role, const ContainerItem& item, const std::string& path,
-                  std::vector<std::string> texts) {
-        std::erase(texts, "");
-        if (!texts.empty())
-            places_.texts.push_back({role, path, item.offset, std::move(texts)});
-    }
-
-    const ByteSource& movie_;
-    ItemWalk atoms_;
     std::uint64_t textSamples_ = 0; ///< of all tracks of texts so far, which may share their samples
     std::uint64_t textBytes_ = 0;
-    MediaPlaces places_;
     std::vector<MovieTrack> tracks_;
     std::set<std::uint64_t> chapterTracks_; ///< that other tracks refer to
     std::vector<ContainerItem> mediaData_;
