@@ -15,10 +15,9 @@ namespace ZULMetaData {
 
 /// A type whose values are stored in an entry as numbers of 32 bits.
 template <class Value>
-inline constexpr bool isNumberField = OneOf<Value, std::int32_t, std::uint32_t, float, double>;
-
-template <class Value>
-concept NumberField = isNumberField<std::remove_cvref_t<Value>>;
+concept NumberField = OneOf < std::remove_cvref_t<Value>,
+        std::int32_t, std::uint32_t,
+float, double > ;
 
 /// Returns the number in the form in which an entry of numbers holds it.
 template <NumberField Value>

@@ -46,7 +46,10 @@ RecordingCompaction::RecordingCompaction(Recording& recording, KeptMetaData kept
     findTail();
     chooseCreators();
     if (kept_ == KeptMetaData::Newest) {
-        requireReachableStreams();
+        const auto& streams = recording_.validation().streams;
+        if (!std::all_of(streams.begin(), streams.end(), [](const auto& stream) { return stream.isReachable; }))
+            throw CompactionError(Obstacle::UnreachableStream,
+                                  "no reader finds some of its streams, and the copy would lose them");
         streams_ = recording_.streams();
     }
     streamsLeftOut_ = recording_.validation().streamCount - streams_.size();
@@ -54,13 +57,6 @@ RecordingCompaction::RecordingCompaction(Recording& recording, KeptMetaData kept
 
 std::uint64_t RecordingCompaction::copiedBytes() const {
     return tail_ < items_.size() ? items_[tail_].offset : recording_.size();
-}
-
-void RecordingCompaction::requireReachableStreams() {
-    const auto& streams = recording_.validation().streams;
-    if (std::any_of(streams.begin(), streams.end(), [](const StreamReport& stream) { return !stream.isReachable; }))
-        throw CompactionError(Obstacle::UnreachableStream,
-                              "no reader finds some of its streams, and the copy would lose them");
 }
 
 /// The tail begins with the first metadata that nothing but metadata, blanks and an index of fragments follows. A blank

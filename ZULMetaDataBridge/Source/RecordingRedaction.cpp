@@ -8,7 +8,6 @@
 #include "ZULMetaDataBridge/Source/RecordingCopy.h"
 #include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 #include "ZULMetaDataBridge/Source/Redaction/CopyCheck.h"
-#include "ZULMetaDataBridge/Source/Redaction/MediaCopy.h"
 #include "ZULMetaDataBridge/Source/StreamSalvage.h"
 
 #include <algorithm>
@@ -47,7 +46,6 @@ public:
         items_ = topLevelItems(file_, container());
         media_ = detail::placesIn(file_, container());
         choosePlaces();
-        mediaCopy_.emplace(file_, blanks_);
     }
 
     bool isEmpty() const { return streams_.empty() && places_.empty(); }
@@ -176,7 +174,8 @@ private:
     }
 
     bool isCopied(std::uint64_t offset) const {
-        return mediaCopy_->isKept(offset) && std::none_of(items_.begin(), items_.end(), [offset](const auto& item) {
+        return std::none_of(blanks_.begin(), blanks_.end(), [=](const auto& blank) { return blank.covers(offset); }) &&
+               std::none_of(items_.begin(), items_.end(), [=](const auto& item) {
                    return item.holdsMetaData() && item.offset <= offset && offset < item.end();
                });
     }
@@ -239,7 +238,7 @@ private:
             done += bytes;
             progress_(Step::Copying, done, total_);
         };
-        const ByteSource media = mediaCopy_->bytes();
+        const ByteSource media = detail::withBlanks(file_, blanks_);
         for (std::size_t i = 0; i < items_.size(); ++i) {
             const ContainerItem& item = items_[i];
             if (!item.holdsMetaData())
@@ -273,7 +272,6 @@ private:
     detail::MediaPlaces media_;
     std::vector<RedactedPlace> places_;
     std::vector<detail::Blank> blanks_;
-    std::optional<detail::MediaCopy> mediaCopy_;
     RedactedTexts texts_;
     Redaction streamRedaction_; ///< of each stream, with the texts of all of them
     std::optional<detail::TextSearch> hiddenTexts_;
