@@ -15,7 +15,6 @@
 #include <fstream>
 #include <limits>
 #include <optional>
-#include <stdexcept>
 #include <utility>
 
 namespace ZULMetaData {
@@ -252,7 +251,9 @@ private:
 
     void writeBlank(std::ostream& out, const ContainerItem& item) const {
         const auto end = static_cast<std::streamoff>(offsetOf(out) + item.size);
-        const auto write = [&out](const auto& header) { out.write(header.data(), header.size()); };
+        const auto write = [&out](const auto& header) {
+            out.write(header.data(), static_cast<std::streamsize>(header.size()));
+        };
         if (!isMovie())
             write(detail::chunkHeader(detail::s_junkChunk, static_cast<std::uint32_t>(item.payloadSize())));
         else if (item.size > std::numeric_limits<std::uint32_t>::max())

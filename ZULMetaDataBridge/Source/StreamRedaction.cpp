@@ -275,10 +275,6 @@ RedactedStream::Removal removalOf(const std::optional<MetaDataHeader>& header, c
     return isLegible ? RedactedStream::Kept : RedactedStream::Undecodable;
 }
 
-void writeHeader(const MetaDataHeader& header, std::ostream& out) {
-    out.write(reinterpret_cast<const char*>(&header), sizeof header);
-}
-
 /// Calls `visit` with each decoded entry of a stream of texts or of lists of texts.
 template <class Visit>
 void visitTexts(StreamEntries& entries, Visit visit) {
@@ -355,7 +351,7 @@ RedactedStream redactStream(const ByteSource& stream, const Redaction& redaction
         reportRemovedStream(entries, redaction);
         return result;
     }
-    writeHeader(result.header, out);
+    out.write(reinterpret_cast<const char*>(&result.header), sizeof result.header);
     const std::set<std::string> heldTexts = textsHeldInside(stream, redaction);
     std::uint64_t end = s_metaDataHeaderSize;
     const bool isWalked = isDecodable(result.header) && RecordedKinds::visit(result.header.uuid, [&]<class Kind>() {

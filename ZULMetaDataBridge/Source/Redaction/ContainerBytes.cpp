@@ -4,7 +4,6 @@
 #include "ZULMetaDataBridge/Source/EntryTexts.h"
 #include "ZULMetaDataBridge/Source/Redaction/TextSearch.h"
 
-#include <algorithm>
 #include <cstring>
 
 namespace ZULMetaData::detail {

@@ -5,7 +5,6 @@
 #include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 
 #include <algorithm>
-#include <array>
 #include <cstring>
 
 namespace ZULMetaData::detail {

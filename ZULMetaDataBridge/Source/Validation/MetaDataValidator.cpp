@@ -6,7 +6,6 @@
 #include "ZULMetaDataBridge/Source/Validation/ContainerWalk.h"
 
 #include <algorithm>
-#include <array>
 #include <stdexcept>
 
 namespace ZULMetaData {
