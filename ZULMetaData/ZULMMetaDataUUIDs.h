@@ -103,8 +103,8 @@ inline constexpr std::array<MetaDataKind, 23> s_metaDataKinds{{
 
 namespace detail {
 
-/// Returns the version of a registered kind. Another identifier does not compile.
-consteval int versionOf(const uuid& type) {
+/// Returns the version of a registered kind, for constants: another identifier does not compile there.
+constexpr int versionOf(const uuid& type) {
     for (const MetaDataKind& kind : s_metaDataKinds)
         if (kind.type == type)
             return kind.currentVersion;

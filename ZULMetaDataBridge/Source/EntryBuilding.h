@@ -2,36 +2,22 @@
 
 // Converts decoded values into entries, along the fields of their kind.
 
-#include "../../SharedDependencies/Export.h"
 #include "EntryDictionary.h"
 #include "MetaDataKinds.h"
 
 #include <concepts>
 #include <cstdint>
-#include <string>
 #include <tuple>
 #include <type_traits>
+#include <variant>
 
 namespace ZULMetaData {
 
-/// Each returns the value in the form in which an entry holds it. Unsigned integers keep their bits; floating-point
-/// numbers are narrowed to 32 bits.
-///@{
-ZULMETADATA_API EntryValue entryValue(std::int32_t value);
-ZULMETADATA_API EntryValue entryValue(std::uint32_t value);
-ZULMETADATA_API EntryValue entryValue(std::uint64_t value);
-ZULMETADATA_API EntryValue entryValue(float value);
-ZULMETADATA_API EntryValue entryValue(double value);
-ZULMETADATA_API EntryValue entryValue(std::string value);
-ZULMETADATA_API EntryValue entryValue(EntryValue value);
-///@}
-
 /// A type whose values are stored in an entry as numbers of 32 bits.
 template <class Value>
-inline constexpr bool isNumberField = OneOf<Value, std::int32_t, std::uint32_t, float, double>;
-
-template <class Value>
-concept NumberField = isNumberField<std::remove_cvref_t<Value>>;
+concept NumberField = OneOf < std::remove_cvref_t<Value>,
+        std::int32_t, std::uint32_t,
+float, double > ;
 
 /// Returns the number in the form in which an entry of numbers holds it.
 template <NumberField Value>
@@ -40,6 +26,18 @@ EntryNumber entryNumber(Value value) {
         return static_cast<std::int32_t>(value);
     else
         return static_cast<float>(value);
+}
+
+/// Returns the value in the form in which an entry holds it. Unsigned integers keep their bits; floating-point numbers
+/// are narrowed to 32 bits.
+template <class Value>
+EntryValue entryValue(Value value) {
+    if constexpr (NumberField<Value>)
+        return std::visit([](auto number) { return EntryValue(number); }, entryNumber(value));
+    else if constexpr (std::same_as<Value, std::uint64_t>)
+        return static_cast<std::int64_t>(value);
+    else
+        return value;
 }
 
 /// Returns the keys of the fields of a kind, followed by "timestamp".

@@ -1,10 +1,7 @@
 #include "ZULMetaDataBridge/Source/EntryDictionary.h"
 
 #include <algorithm>
-#include <memory>
 #include <stdexcept>
-#include <type_traits>
-#include <utility>
 
 namespace ZULMetaData {
 

@@ -2,9 +2,7 @@
 
 #include "SharedDependencies/UTF8.h"
 
-#include <algorithm>
-#include <cstddef>
-#include <cstdint>
+#include <array>
 #include <stdexcept>
 
 namespace ZULMetaData {
@@ -82,17 +80,18 @@ std::string textFromUTF8(const std::string& bytes) {
     return std::string(text);
 }
 
+std::string detail::encodedUTF8(std::uint32_t number) {
+    const int further = number < 0x80 ? 0 : number < 0x800 ? 1 : number < 0x10000 ? 2 : 3; // bytes
+    constexpr std::array<std::uint32_t, 4> marks{0, 0xc0, 0xe0, 0xf0};
+    std::string bytes(1, static_cast<char>(marks[static_cast<std::size_t>(further)] | number >> 6 * further));
+    for (int i = further - 1; i >= 0; --i)
+        bytes.push_back(static_cast<char>(0x80 | (number >> 6 * i & 0x3f)));
+    return bytes;
+}
+
 std::string utf8Character(std::uint32_t codePoint) {
-    const auto continuation = [codePoint](int shift) { return static_cast<char>(0x80 | (codePoint >> shift & 0x3f)); };
-    if (codePoint < 0x80)
-        return {static_cast<char>(codePoint)};
-    if (codePoint < 0x800)
-        return {static_cast<char>(0xc0 | codePoint >> 6), continuation(0)};
-    if (codePoint >= 0x110000 || (codePoint >= 0xd800 && codePoint <= 0xdfff))
-        return {};
-    if (codePoint < 0x10000)
-        return {static_cast<char>(0xe0 | codePoint >> 12), continuation(6), continuation(0)};
-    return {static_cast<char>(0xf0 | codePoint >> 18), continuation(12), continuation(6), continuation(0)};
+    const bool isCharacter = codePoint < 0xd800 || (codePoint > 0xdfff && codePoint < 0x110000);
+    return isCharacter ? detail::encodedUTF8(codePoint) : std::string();
 }
 
 std::string utf8FromLatin1(std::string_view bytes) {

@@ -22,6 +22,13 @@ ZULMETADATA_API std::size_t validCharacterLength(std::string_view bytes);
 /// Returns the character with this number as UTF-8. Empty for surrogates and for numbers beyond U+10FFFF.
 ZULMETADATA_API std::string utf8Character(std::uint32_t codePoint);
 
+namespace detail {
+
+/// Returns a number below 0x200000 in the form of a character of UTF-8, even if it is none.
+std::string encodedUTF8(std::uint32_t number);
+
+} // namespace detail
+
 /// Returns all bytes as UTF-8, each the character of its number (ISO 8859-1).
 ZULMETADATA_API std::string utf8FromLatin1(std::string_view bytes);
 

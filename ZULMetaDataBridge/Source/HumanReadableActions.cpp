@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <array>
+#include <span>
 #include <stdexcept>
 #include <string_view>
 
@@ -106,15 +107,13 @@ constexpr bool comesFirst(const Named& left, const Named& right) {
 
 static_assert(std::is_sorted(s_keys.begin(), s_keys.end(), comesFirst));
 
-template <std::size_t Size>
-const Named* firstSet(const std::array<Named, Size>& names, int bits) {
+const Named* firstSet(std::span<const Named> names, int bits) {
     const auto isSet = [bits](const Named& name) { return HumanReadableActions::HasFlag(bits, name.value); };
     const auto found = std::find_if(names.begin(), names.end(), isSet);
     return found == names.end() ? nullptr : &*found;
 }
 
-template <std::size_t Size>
-std::string textOfAllSet(const std::array<Named, Size>& names, int bits) {
+std::string textOfAllSet(std::span<const Named> names, int bits) {
     std::string text;
     for (const Named& name : names)
         if (HumanReadableActions::HasFlag(bits, name.value))

@@ -1,6 +1,7 @@
 #include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 
 #include "ZULMetaData/Containers/ContainerLayout.h"
+#include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 
 #include <cstdint>
 #include <cstring>
@@ -8,12 +9,6 @@
 namespace ZULMetaData {
 
 namespace {
-
-std::string bytesOf(const ByteSource& source) {
-    std::string bytes(static_cast<std::size_t>(source.size()), '\0');
-    bytes.resize(source.read(0, bytes));
-    return bytes;
-}
 
 constexpr std::size_t s_formSize = 4;
 
@@ -32,14 +27,14 @@ std::string metaDataExcerpt(MetaDataParser& recording) {
     const ByteSource file = ByteSource::stream(recording.getStream());
     const Container::Type type = recording.getStreamType();
     if (type == Container::RawStream)
-        return bytesOf(file);
+        return detail::readAll(file);
     std::string excerpt;
     ItemWalk items(file, type);
     while (const auto item = items.next()) {
         if (type == Container::Riff && item->offset == 0)
-            excerpt += emptyRIFF(bytesOf(file.part(0, item->headerSize + s_formSize)));
+            excerpt += emptyRIFF(detail::readAll(file.part(0, item->headerSize + s_formSize)));
         if (item->type == "ftyp" || item->holdsRecordingInfo() || item->holdsMetaData())
-            excerpt += bytesOf(file.part(item->offset, item->size));
+            excerpt += detail::readAll(file.part(item->offset, item->size));
         if (type == Container::Riff)
             excerpt.resize(excerpt.size() + excerpt.size() % 2);
     }

@@ -49,107 +49,76 @@ inline constexpr std::tuple s_pointFields{Field{"x", &Point::x},
 inline constexpr std::tuple s_rectFields{Field{"x", &Rect::x}, Field{"y", &Rect::y}, Field{"width", &Rect::width},
                                          Field{"height", &Rect::height}};
 
-/// Where the window on top was.
-struct TopmostWindowKind {
-    using Value = Rect;                                     ///< the type of the values in the stream
-    static constexpr uuid type = s_topmostWindowUUID;       ///< the identifier in the header of the stream
+/// What all kinds have. A kind adds `fields`: the keys of its entries, which "timestamp" follows.
+template <StreamValue T, const uuid& identifier>
+struct StreamKind {
+    using Value = T;                                        ///< the type of the values in the stream
+    static constexpr uuid type = identifier;                ///< the identifier in the header of the stream
     static constexpr int version = detail::versionOf(type); ///< the version that is written; earlier ones are read too
-    static constexpr auto fields = s_rectFields;            ///< the keys of its entries, which "timestamp" follows
+};
+
+/// Where the window on top was.
+struct TopmostWindowKind : StreamKind<Rect, s_topmostWindowUUID> {
+    static constexpr auto fields = s_rectFields;
 };
 
 /// What the cursor hovered over.
-struct HoverRectKind {
-    using Value = Rect;
-    static constexpr uuid type = s_hoverRectUUID;
-    static constexpr int version = detail::versionOf(type);
+struct HoverRectKind : StreamKind<Rect, s_hoverRectUUID> {
     static constexpr auto fields = s_rectFields;
 };
 
 /// The recorded region.
-struct RecordingRegionKind {
-    using Value = Rect;
-    static constexpr uuid type = s_recordingRegionUUID;
-    static constexpr int version = detail::versionOf(type);
+struct RecordingRegionKind : StreamKind<Rect, s_recordingRegionUUID> {
     static constexpr auto fields = s_rectFields;
 };
 
 /// Scroll deltas.
-struct ScrollActionKind {
-    using Value = Point;
-    static constexpr uuid type = s_scrollActionUUID;
-    static constexpr int version = detail::versionOf(type);
+struct ScrollActionKind : StreamKind<Point, s_scrollActionUUID> {
     static constexpr auto fields = s_pointFields;
 };
 
 /// Where the cursor was.
-struct CursorLocationKind {
-    using Value = Point;
-    static constexpr uuid type = s_cursorLocationUUID;
-    static constexpr int version = detail::versionOf(type);
+struct CursorLocationKind : StreamKind<Point, s_cursorLocationUUID> {
     static constexpr auto fields = s_pointFields;
 };
 
 /// How busy the machine was.
-struct CPUUsageKind {
-    using Value = float;
-    static constexpr uuid type = s_cpuUsageUUID;
-    static constexpr int version = detail::versionOf(type);
+struct CPUUsageKind : StreamKind<float, s_cpuUsageUUID> {
     static constexpr std::tuple fields{Field{"cpuUsage", wholeValue}};
 };
 
 /// How opaque the cursor was drawn.
-struct CursorOpacityKind {
-    using Value = double;
-    static constexpr uuid type = s_cursorOpacityUUID;
-    static constexpr int version = detail::versionOf(type);
+struct CursorOpacityKind : StreamKind<double, s_cursorOpacityUUID> {
     static constexpr std::tuple fields{Field{"opacity", wholeValue}};
 };
 
 /// The display's scale factor.
-struct ScaleFactorKind {
-    using Value = std::int32_t;
-    static constexpr uuid type = s_recordingScaleFactorUUID;
-    static constexpr int version = detail::versionOf(type);
+struct ScaleFactorKind : StreamKind<std::int32_t, s_recordingScaleFactorUUID> {
     static constexpr std::tuple fields{Field{"scaleFactor", wholeValue}};
 };
 
 /// Titles of slides.
-struct SlideInfoTitleKind {
-    using Value = std::string;
-    static constexpr uuid type = s_slideTitlesUUID;
-    static constexpr int version = detail::versionOf(type);
+struct SlideInfoTitleKind : StreamKind<std::string, s_slideTitlesUUID> {
     static constexpr std::tuple fields{Field{"title", textFromUTF8}};
 };
 
 /// Texts of slides.
-struct SlideInfoTextKind {
-    using Value = std::string;
-    static constexpr uuid type = s_slideTextUUID;
-    static constexpr int version = detail::versionOf(type);
+struct SlideInfoTextKind : StreamKind<std::string, s_slideTextUUID> {
     static constexpr std::tuple fields{Field{"text", textFromUTF8}};
 };
 
 /// Comments to slides.
-struct SlideInfoCommentKind {
-    using Value = std::string;
-    static constexpr uuid type = s_slideCommentUUID;
-    static constexpr int version = detail::versionOf(type);
+struct SlideInfoCommentKind : StreamKind<std::string, s_slideCommentUUID> {
     static constexpr std::tuple fields{Field{"comment", textFromUTF8}};
 };
 
 /// The title of the window on top.
-struct TopmostWindowTitleKind {
-    using Value = std::string;
-    static constexpr uuid type = s_topmostWindowTitleUUID;
-    static constexpr int version = detail::versionOf(type);
+struct TopmostWindowTitleKind : StreamKind<std::string, s_topmostWindowTitleUUID> {
     static constexpr std::tuple fields{Field{"title", textFromUTF8}};
 };
 
 /// The application in front.
-struct TopmostAppNameKind {
-    using Value = std::string;
-    static constexpr uuid type = s_topmostAppNameUUID;
-    static constexpr int version = detail::versionOf(type);
+struct TopmostAppNameKind : StreamKind<std::string, s_topmostAppNameUUID> {
     static constexpr std::tuple fields{Field{"name", textFromUTF8}};
 };
 
@@ -157,20 +126,14 @@ struct TopmostAppNameKind {
 ZULMETADATA_API EntryValue entryImage(const CursorImage& cursor);
 
 /// What the cursor looked like.
-struct CursorImageKind {
-    using Value = CursorImage;
-    static constexpr uuid type = s_cursorImageUUID;
-    static constexpr int version = detail::versionOf(type);
+struct CursorImageKind : StreamKind<CursorImage, s_cursorImageUUID> {
     static constexpr std::tuple fields{Field{"image", entryImage}, Field{"id", &CursorImage::uniqueId},
                                        Field{"hotspotOffsetX", &CursorImage::hotspotOffsetX},
                                        Field{"hotspotOffsetY", &CursorImage::hotspotOffsetY}};
 };
 
 /// Buttons and modifiers.
-struct CursorActionKind {
-    using Value = std::int32_t;
-    static constexpr uuid type = s_cursorActionUUID;
-    static constexpr int version = detail::versionOf(type);
+struct CursorActionKind : StreamKind<std::int32_t, s_cursorActionUUID> {
     static constexpr std::tuple fields{Field{"action", HumanReadableActions::CursorActionToString},
                                        Field{"rawActionValue", wholeValue}};
 };
@@ -186,10 +149,7 @@ inline std::string keyModifiersText(const KeyStroke& key) {
 }
 
 /// Keys and modifiers.
-struct KeyboardActionKind {
-    using Value = KeyStroke;
-    static constexpr uuid type = s_keyboardActionUUID;
-    static constexpr int version = detail::versionOf(type);
+struct KeyboardActionKind : StreamKind<KeyStroke, s_keyboardActionUUID> {
     static constexpr std::tuple fields{
         Field{"characterCode", &KeyStroke::characterCode}, Field{"characterString", keyText},
         Field{"eventFlagsCode", &KeyStroke::eventFlagsCode}, Field{"eventFlagsString", keyModifiersText}};
@@ -204,10 +164,7 @@ std::string systemText(const std::list<std::string>& texts) {
 }
 
 /// The machine.
-struct SystemDataKind {
-    using Value = std::list<std::string>;
-    static constexpr uuid type = s_systemDataUUID;
-    static constexpr int version = detail::versionOf(type);
+struct SystemDataKind : StreamKind<std::list<std::string>, s_systemDataUUID> {
     static constexpr std::tuple fields{Field{"processorCount", systemText<0>},
                                        Field{"activeProcessorCount", systemText<1>}, Field{"osVersion", systemText<2>},
                                        Field{"ram", systemText<3>}};

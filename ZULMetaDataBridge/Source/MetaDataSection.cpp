@@ -1,11 +1,11 @@
 #include "ZULMetaDataBridge/Source/MetaDataSection.h"
 
 #include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 
 #include <algorithm>
 #include <cerrno>
 #include <limits>
-#include <span>
 #include <stdexcept>
 #include <string>
 #include <system_error>
@@ -60,19 +60,22 @@ void MetaDataSection::finish() {
         close(begin_, detail::s_metaDataAtom);
 }
 
-void appendBytes(const ByteSource& source, std::ostream& out) {
-    constexpr std::size_t pieceSize = 1 << 20;
-    std::vector<char> piece(static_cast<std::size_t>(std::min<std::uint64_t>(source.size(), pieceSize)));
-    for (std::uint64_t done = 0; done < source.size();) {
-        const std::size_t size = source.read(done, piece);
-        if (size == 0)
-            throw std::system_error(EIO, std::generic_category(), "it ends at offset " + std::to_string(done));
-        const std::span bytes = std::span(piece).first(size);
-        if (std::all_of(bytes.begin(), bytes.end(), [](char byte) { return byte == 0; }))
-            out.seekp(static_cast<std::streamoff>(size), std::ios_base::cur);
+void appendBytes(const ByteSource& source, std::uint64_t offset, std::uint64_t size, std::ostream& out,
+                 const std::function<void(std::uint64_t)>& advance) {
+    constexpr std::uint64_t longestPiece = 1 << 20;
+    std::vector<char> piece(static_cast<std::size_t>(std::min(size, longestPiece)));
+    for (const std::uint64_t end = offset + size; offset < end;) {
+        const auto wanted = static_cast<std::size_t>(std::min(end - offset, longestPiece));
+        const std::string_view bytes(piece.data(), source.read(offset, {piece.data(), wanted}));
+        if (bytes.empty())
+            throw std::system_error(EIO, std::generic_category(), "it ends at offset " + std::to_string(offset));
+        if (detail::isZero(bytes))
+            out.seekp(static_cast<std::streamoff>(bytes.size()), std::ios_base::cur);
         else
-            out.write(bytes.data(), static_cast<std::streamsize>(size));
-        done += size;
+            out.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+        offset += bytes.size();
+        if (advance)
+            advance(bytes.size());
     }
 }
 

@@ -8,6 +8,7 @@
 #include "ZULMetaData/Containers/ContainerType.h"
 
 #include <cstdint>
+#include <functional>
 #include <ostream>
 
 namespace ZULMetaData {
@@ -44,8 +45,9 @@ private:
     std::uint64_t firstStream_;
 };
 
-/// Appends a source to an output. Bytes that are zero are skipped, so that holes of a file stay holes. Throws
-/// `std::system_error` if the source ends early.
-void appendBytes(const ByteSource& source, std::ostream& out);
+/// Appends a part of a source to an output. Pieces that are zero are skipped, so that holes of a file stay holes. Calls
+/// `advance` with the number of bytes that were copied. Throws `std::system_error` if the source ends early.
+void appendBytes(const ByteSource& source, std::uint64_t offset, std::uint64_t size, std::ostream& out,
+                 const std::function<void(std::uint64_t)>& advance = {});
 
 } // namespace ZULMetaData

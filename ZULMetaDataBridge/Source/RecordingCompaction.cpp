@@ -1,16 +1,14 @@
 #include "ZULMetaDataBridge/Source/RecordingCompaction.h"
 
 #include "ZULMetaData/Containers/AtomFormat.h"
-#include "ZULMetaData/Containers/RepairPlan.h"
 #include "ZULMetaDataBridge/Source/MetaDataSection.h"
+#include "ZULMetaDataBridge/Source/RecordingCopy.h"
+#include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 
 #include <algorithm>
-#include <cerrno>
-#include <filesystem>
 #include <fstream>
 #include <set>
 #include <span>
-#include <system_error>
 
 namespace ZULMetaData {
 
@@ -38,28 +36,20 @@ bool isMovable(const ContainerItem& item) {
     return isOwn(item) || isBlank(item) || isIndex(item);
 }
 
-std::string allOf(const ByteSource& source) {
-    std::string bytes(static_cast<std::size_t>(source.size()), '\0');
-    bytes.resize(source.read(0, bytes));
-    return bytes;
-}
-
-[[noreturn]] void failToComplete() {
-    throw CompactionError(Obstacle::CannotWrite,
-                          "cannot be written: " + std::error_code(errno, std::generic_category()).message());
-}
-
 } // namespace
 
 RecordingCompaction::RecordingCompaction(Recording& recording, KeptMetaData kept)
     : recording_(recording), kept_(kept), items_(topLevelItems(recording.bytes(), recording.container())) {
     if (recording_.container() == Container::RawStream)
         throw CompactionError(Obstacle::NoContainer, "is a stream alone, without a movie around it");
-    requireWholeContainer();
+    requireWholeContainer<CompactionError>(recording_.bytes(), recording_.container(), items_);
     findTail();
     chooseCreators();
     if (kept_ == KeptMetaData::Newest) {
-        requireReachableStreams();
+        const auto& streams = recording_.validation().streams;
+        if (!std::all_of(streams.begin(), streams.end(), [](const auto& stream) { return stream.isReachable; }))
+            throw CompactionError(Obstacle::UnreachableStream,
+                                  "no reader finds some of its streams, and the copy would lose them");
         streams_ = recording_.streams();
     }
     streamsLeftOut_ = recording_.validation().streamCount - streams_.size();
@@ -67,23 +57,6 @@ RecordingCompaction::RecordingCompaction(Recording& recording, KeptMetaData kept
 
 std::uint64_t RecordingCompaction::copiedBytes() const {
     return tail_ < items_.size() ? items_[tail_].offset : recording_.size();
-}
-
-void RecordingCompaction::requireWholeContainer() const {
-    const RepairPlan plan = isMovie() ? planRepair(recording_.bytes()) : RepairPlan();
-    if (plan.state == RepairPlan::Repairable)
-        throw CompactionError(Obstacle::Repairable, plan.finding);
-    const std::uint64_t end = items_.empty() ? 0 : items_.back().end();
-    const bool fillsFile = end == recording_.size() || (!isMovie() && end + end % 2 == recording_.size());
-    if (plan.state == RepairPlan::Unrepairable || !fillsFile)
-        throw CompactionError(Obstacle::Damaged, plan.finding.empty() ? "its parts do not fill the file" : plan.finding);
-}
-
-void RecordingCompaction::requireReachableStreams() {
-    const auto& streams = recording_.validation().streams;
-    if (std::any_of(streams.begin(), streams.end(), [](const StreamReport& stream) { return !stream.isReachable; }))
-        throw CompactionError(Obstacle::UnreachableStream,
-                              "no reader finds some of its streams, and the copy would lose them");
 }
 
 /// The tail begins with the first metadata that nothing but metadata, blanks and an index of fragments follows. A blank
@@ -101,7 +74,8 @@ bool RecordingCompaction::isCopyOfIndex(const ContainerItem& blank) const {
     const ContainerItem& index = items_.back();
     if (!isIndex(index) || index.size != blank.size || blank.size > s_mostCompared)
         return false;
-    return allOf(bytesOf(blank).part(detail::s_atomHeaderSize)) == allOf(bytesOf(index).part(detail::s_atomHeaderSize));
+    return detail::readAll(bytesOf(blank).part(detail::s_atomHeaderSize)) ==
+           detail::readAll(bytesOf(index).part(detail::s_atomHeaderSize));
 }
 
 /// The last one stays of recording info that says the same.
@@ -114,7 +88,7 @@ void RecordingCompaction::chooseCreators() {
             indexes.push_back(item);
         if (!item.holdsRecordingInfo())
             continue;
-        const bool isNew = item.size > s_mostCompared || seen.insert(allOf(bytesOf(item))).second;
+        const bool isNew = item.size > s_mostCompared || seen.insert(detail::readAll(bytesOf(item))).second;
         if (kept_ == KeptMetaData::Newest && isNew)
             appended_.insert(appended_.begin(), item);
         else
@@ -127,21 +101,13 @@ void RecordingCompaction::complete(const FileLocation& copy) {
     std::fstream out;
     fileOpen(out, utf8Path(copy).c_str(), std::ios::in | std::ios::out | std::ios::binary);
     if (!out.is_open())
-        failToComplete();
+        failToWrite<CompactionError>();
     blankEarlierMetaData(out);
     out.seekp(static_cast<std::streamoff>(copiedBytes()));
     writeStreams(out);
     for (const ContainerItem& item : appended_)
-        appendBytes(bytesOf(item), out);
-    const auto end = out.tellp();
-    out.close();
-    if (!out || end < 0)
-        failToComplete();
-    sizeAfter_ = static_cast<std::uint64_t>(end);
-    std::error_code error;
-    std::filesystem::resize_file(copy, sizeAfter_, error); // what was skipped at the end is zero
-    if (error)
-        throw CompactionError(Obstacle::CannotWrite, "cannot be written: " + error.message());
+        appendBytes(bytesOf(item), 0, item.size, out);
+    sizeAfter_ = finishCopy<CompactionError>(out, copy);
 }
 
 /// Metadata before the media leaves its place empty: the media may know the offsets of what follows.
@@ -165,7 +131,7 @@ void RecordingCompaction::writeStreams(std::ostream& out) {
             const ByteSource bytes = recording_.bytes().part(stream.offset, stream.declaredBytes);
             const auto extent = measureStream(bytes);
             const std::uint64_t whole = extent ? extent->wholeBytes : bytes.size();
-            appendBytes(bytes.part(0, whole), output);
+            appendBytes(bytes, 0, whole, output);
             bytesCut_ += stream.declaredBytes - whole;
             return true;
         });

@@ -66,8 +66,6 @@ public:
 
 private:
     bool isMovie() const { return recording_.container() == Container::QuickTime; }
-    void requireWholeContainer() const;
-    void requireReachableStreams();
     void findTail();
     bool isCopyOfIndex(const ContainerItem& blank) const;
     void chooseCreators();

@@ -4,22 +4,17 @@
 #include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/RecordingInfo.h"
-#include "ZULMetaData/Containers/RepairPlan.h"
 #include "ZULMetaDataBridge/Source/MetaDataSection.h"
+#include "ZULMetaDataBridge/Source/RecordingCopy.h"
+#include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 #include "ZULMetaDataBridge/Source/Redaction/CopyCheck.h"
-#include "ZULMetaDataBridge/Source/Redaction/MediaCopy.h"
-#include "ZULMetaDataBridge/Source/Redaction/NullOutput.h"
 #include "ZULMetaDataBridge/Source/StreamSalvage.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <cstring>
-#include <filesystem>
 #include <fstream>
 #include <limits>
 #include <optional>
-#include <stdexcept>
-#include <system_error>
 #include <utility>
 
 namespace ZULMetaData {
@@ -28,73 +23,245 @@ namespace {
 
 using Reason = RedactionError::Reason;
 
-constexpr std::uint64_t s_most32 = std::numeric_limits<std::uint32_t>::max();
-
-template <std::size_t size>
-void writeBytes(std::ostream& out, const std::array<char, size>& bytes) {
-    out.write(bytes.data(), static_cast<std::streamsize>(size));
-}
-
-[[noreturn]] void failToWrite() {
-    throw RedactionError(Reason::CannotWrite, std::string("cannot be written: ") + std::strerror(errno));
-}
-
 /// A stream does not call itself failed if it cannot tell its position, and what is written then would stand in the
 /// wrong place.
 std::uint64_t offsetOf(std::ostream& out) {
     const auto position = out.tellp();
     if (position < 0)
-        failToWrite();
+        failToWrite<RedactionError>();
     return static_cast<std::uint64_t>(position);
-}
-
-/// The file ends where it was written or skipped to.
-void finish(std::ofstream& out, const FileLocation& file) {
-    const std::uint64_t end = offsetOf(out);
-    out.close();
-    if (!out)
-        failToWrite();
-    std::error_code error;
-    std::filesystem::resize_file(file, end, error);
-    if (error)
-        throw RedactionError(Reason::CannotWrite, "cannot be written: " + error.message());
-}
-
-std::uint64_t padded(std::uint64_t size) {
-    return size + size % 2;
 }
 
 } // namespace
 
 class RecordingRedactor::Work {
 public:
-    Work(std::istream& recording, Container::Type type, RecordingRedaction redaction, Progress progress);
+    Work(std::istream& recording, Container::Type type, RecordingRedaction redaction, Progress progress)
+        : redaction_(std::move(redaction)), progress_(std::move(progress)), parser_(openContainer(recording, type)),
+          file_(ByteSource::stream(recording)), total_(file_.size()) {
+        if (!progress_)
+            progress_ = [](Step, std::uint64_t, std::uint64_t) {};
+        streams_ = detail::streamsIn(*parser_, file_);
+        items_ = topLevelItems(file_, container());
+        media_ = detail::placesIn(file_, container());
+        choosePlaces();
+    }
 
     bool isEmpty() const { return streams_.empty() && places_.empty(); }
-    RedactedRecording preview();
-    RedactedRecording write(const FileLocation& copy);
+
+    RedactedRecording preview() {
+        prepare();
+        std::ofstream nowhere; // is not open and drops everything
+        return result(redactAll(nowhere));
+    }
+
+    RedactedRecording write(const FileLocation& copy) {
+        prepare();
+        std::ofstream out;
+        fileOpen(out, utf8Path(copy).c_str(), std::ios::binary | std::ios::trunc);
+        if (!out.is_open())
+            failToWrite<RedactionError>();
+        std::vector<RedactedStream> streams = writeContents(out);
+        finishCopy<RedactionError>(out, copy);
+        std::ifstream written;
+        fileOpen(written, utf8Path(copy).c_str(), std::ios::binary);
+        if (!written.is_open())
+            throw RedactionError(Reason::CannotWrite, std::string("cannot be read back: ") + std::strerror(errno));
+        const std::uint64_t size = ByteSource::stream(written).size();
+        std::uint64_t done = 0;
+        check_->requireClean(written, container(), [&](std::uint64_t bytes) {
+            done += bytes;
+            progress_(Step::Checking, done, size);
+        });
+        return result(std::move(streams));
+    }
 
 private:
     Container::Type container() const { return parser_->getStreamType(); }
     bool isMovie() const { return container() == Container::QuickTime; }
 
-    void choosePlaces();
-    void addPlace(RedactedPlace::Reason reason, const detail::MediaPlace& place);
-    void chooseCreator();
-    void prepare();
-    void collectTexts();
-    void requireWholeContainer();
-    void requireNothingMisplaced();
-    bool isCopied(std::uint64_t offset) const;
-    bool isBeforeMedia(std::size_t item) const;
-    RedactedRecording result(std::vector<RedactedStream> streams) const;
+    void choosePlaces() {
+        for (const detail::MediaPlace& place : media_.places) {
+            const bool isText = place.use == detail::MediaPlace::Use::Text;
+            if (isText ? redaction_.removesChapters : redaction_.blanksUnknown)
+                addPlace(isText ? RedactedPlace::Text : RedactedPlace::Unknown, place);
+        }
+        if (redaction_.removesCreator && isMovie())
+            chooseCreator();
+        std::stable_sort(places_.begin(), places_.end(),
+                         [](const auto& left, const auto& right) { return left.offset < right.offset; });
+        std::uint64_t end = 0; // of the outermost place; what is inside goes with it
+        std::erase_if(places_, [&end](const RedactedPlace& place) {
+            const bool isInside = place.offset < end;
+            end = std::max(end, place.offset + place.size);
+            return isInside;
+        });
+    }
 
-    RedactedStream redact(const detail::StreamPart& stream, std::ostream& out) const;
-    std::vector<RedactedStream> writeContents(std::ostream& out);
-    std::vector<RedactedStream> writeStreamFile(std::ostream& out) const;
-    std::vector<RedactedStream> writeMetaData(std::ostream& out) const;
-    void writeMedia(std::ostream& out);
-    void writeBlank(std::ostream& out, const ContainerItem& item) const;
+    void addPlace(RedactedPlace::Reason reason, const detail::MediaPlace& place) {
+        places_.push_back({reason, place.path, place.offset, place.size});
+        blanks_.insert(blanks_.end(), place.blanks.begin(), place.blanks.end());
+    }
+
+    void chooseCreator() {
+        const ZCAPHeader info = detail::neutralRecordingInfo();
+        const std::string neutral(reinterpret_cast<const char*>(&info), sizeof info);
+        for (const ContainerItem& item : items_) {
+            if (!item.holdsRecordingInfo())
+                continue;
+            std::string head = item.payloadSize() >= neutral.size() ? neutral : std::string();
+            const std::string stored = detail::readBytes(file_, item.payloadOffset(), head.size());
+            if (item.payloadSize() > 0 && (stored != head || item.payloadSize() != head.size()))
+                addPlace(RedactedPlace::Creator, {{},
+                                                  item.type.text(),
+                                                  item.offset,
+                                                  item.size,
+                                                  {{item.payloadOffset(), item.payloadSize(), std::move(head)}}});
+        }
+    }
+
+    void prepare() {
+        if (check_)
+            return;
+        if (container() != Container::RawStream)
+            requireWholeContainer<RedactionError>(file_, container(), items_);
+        collectTexts();
+        check_.emplace(redaction_, streamRedaction_, texts_);
+        check_->requireNoTextStays(media_);
+        if (container() != Container::RawStream)
+            requireNothingMisplaced();
+    }
+
+    /// A text that one stream makes a secret is hidden in every stream, and in every text that contains it if it is
+    /// long.
+    void collectTexts() {
+        for (const detail::StreamPart& stream : streams_)
+            collectRedactedTexts(stream.bytes, redaction_.streams, texts_);
+        streamRedaction_ = redaction_.streams;
+        hiddenTexts_.emplace(texts_.hidden, redaction_.spellings);
+        if (!redaction_.streams.removedTimes.empty() || redaction_.streams.hidesText)
+            streamRedaction_.hidesText = [this](const std::string& text) {
+                const auto& asked = redaction_.streams.hidesText;
+                return text != s_hiddenText && (hiddenTexts_->isIn(text) || (asked && asked(text)));
+            };
+        if (!redaction_.removesCreator)
+            return;
+        for (const ZCAPHeader& info : readRecordingInfo(file_, container()))
+            for (const std::string& text :
+                 {info.creator.name(), info.creator.version(), info.creator.platformVersion()})
+                if (!text.empty() && text != CreatorAttributes::platformNameMac())
+                    texts_.removed.insert(text);
+    }
+
+    /// A stream in a place that is copied as it is would stay in the copy.
+    void requireNothingMisplaced() {
+        StreamSalvage salvage(file_, container(),
+                              [this](std::uint64_t done) { progress_(Step::Searching, done, total_); });
+        const SalvageReport report = salvage.run();
+        if (report.hasMore)
+            throw RedactionError(Reason::MisplacedStream,
+                                 "has more than " + std::to_string(SalvageReport::s_maximumStreams) +
+                                     " places that look like streams, and not all of them could be looked into");
+        for (const SalvagedStream& stream : report.streams) {
+            if (isCopied(stream.offset))
+                throw RedactionError(Reason::MisplacedStream,
+                                     metaDataKindName(stream.header.uuid) + " at offset " +
+                                         std::to_string(stream.offset) +
+                                         " is outside of the metadata and would stay in the copy");
+            unreachable_ += stream.origin == SalvagedStream::Reachable ? 0 : 1;
+        }
+    }
+
+    bool isCopied(std::uint64_t offset) const {
+        return std::none_of(blanks_.begin(), blanks_.end(), [=](const auto& blank) { return blank.covers(offset); }) &&
+               std::none_of(items_.begin(), items_.end(), [=](const auto& item) {
+                   return item.holdsMetaData() && item.offset <= offset && offset < item.end();
+               });
+    }
+
+    /// Whether something follows whose place may be known to the media.
+    bool isBeforeMedia(std::size_t item) const {
+        return std::any_of(items_.begin() + static_cast<std::ptrdiff_t>(item), items_.end(),
+                           [](const auto& next) { return !next.holdsMetaData() && !next.holdsRecordingInfo(); });
+    }
+
+    RedactedRecording result(std::vector<RedactedStream> streams) const {
+        return {std::move(streams), places_, unreachable_};
+    }
+
+    RedactedStream redact(const detail::StreamPart& stream, std::ostream& out) const {
+        RedactedStream redacted = redactStream(stream.bytes, streamRedaction_, out);
+        redacted.bytesLeftOut += stream.declared - stream.bytes.size();
+        redacted.header.uuid = stream.type;
+        return redacted;
+    }
+
+    std::vector<RedactedStream> writeContents(std::ostream& out) {
+        if (container() == Container::RawStream) {
+            std::vector<RedactedStream> streams = redactAll(out);
+            if (streams.empty() || streams.front().removal != RedactedStream::Kept)
+                throw RedactionError(Reason::NothingLeft, "nothing would be left of it");
+            return streams;
+        }
+        writeMedia(out);
+        try {
+            return writeMetaData(out);
+        } catch (const std::length_error& error) {
+            throw RedactionError(Reason::TooLarge, error.what());
+        }
+    }
+
+    std::vector<RedactedStream> redactAll(std::ostream& out) const {
+        std::vector<RedactedStream> streams;
+        for (const detail::StreamPart& stream : streams_)
+            streams.push_back(redact(stream, out));
+        return streams;
+    }
+
+    std::vector<RedactedStream> writeMetaData(std::ostream& out) const {
+        std::vector<RedactedStream> streams;
+        MetaDataSection section(out, container());
+        for (const detail::StreamPart& stream : streams_)
+            section.add([&](std::ostream& output) {
+                streams.push_back(redact(stream, output));
+                return streams.back().removal == RedactedStream::Kept;
+            });
+        section.finish();
+        return streams;
+    }
+
+    /// Everything but the metadata, which leaves free space if media follow it.
+    void writeMedia(std::ostream& out) {
+        std::uint64_t done = 0;
+        const auto advance = [&](std::uint64_t bytes) {
+            done += bytes;
+            progress_(Step::Copying, done, total_);
+        };
+        const ByteSource media = detail::withBlanks(file_, blanks_);
+        for (std::size_t i = 0; i < items_.size(); ++i) {
+            const ContainerItem& item = items_[i];
+            if (!item.holdsMetaData())
+                appendBytes(media, item.offset, item.size, out, advance);
+            else if (isBeforeMedia(i))
+                writeBlank(out, item);
+            if (!isMovie())
+                out.seekp(static_cast<std::streamoff>(offsetOf(out) % 2), std::ios::cur);
+        }
+    }
+
+    void writeBlank(std::ostream& out, const ContainerItem& item) const {
+        const auto end = static_cast<std::streamoff>(offsetOf(out) + item.size);
+        const auto write = [&out](const auto& header) {
+            out.write(header.data(), static_cast<std::streamsize>(header.size()));
+        };
+        if (!isMovie())
+            write(detail::chunkHeader(detail::s_junkChunk, static_cast<std::uint32_t>(item.payloadSize())));
+        else if (item.size > std::numeric_limits<std::uint32_t>::max())
+            write(detail::extendedAtomHeader(detail::s_freeAtom, item.size));
+        else
+            write(detail::atomHeader(detail::s_freeAtom, static_cast<std::uint32_t>(item.size)));
+        out.seekp(end);
+    }
 
     RecordingRedaction redaction_;
     Progress progress_;
@@ -106,240 +273,12 @@ private:
     detail::MediaPlaces media_;
     std::vector<RedactedPlace> places_;
     std::vector<detail::Blank> blanks_;
-    std::optional<detail::MediaCopy> mediaCopy_;
     RedactedTexts texts_;
     Redaction streamRedaction_; ///< of each stream, with the texts of all of them
     std::optional<detail::TextSearch> hiddenTexts_;
     std::optional<detail::CopyCheck> check_;
     std::uint64_t unreachable_ = 0;
 };
-
-RecordingRedactor::Work::Work(std::istream& recording, Container::Type type, RecordingRedaction redaction,
-                              Progress progress)
-    : redaction_(std::move(redaction)), progress_(std::move(progress)), parser_(openContainer(recording, type)),
-      file_(ByteSource::stream(recording)), total_(file_.size()) {
-    if (!progress_)
-        progress_ = [](Step, std::uint64_t, std::uint64_t) {};
-    streams_ = detail::streamsIn(*parser_, file_);
-    items_ = topLevelItems(file_, container());
-    media_ = detail::placesIn(file_, container());
-    choosePlaces();
-    mediaCopy_.emplace(file_, blanks_);
-}
-
-void RecordingRedactor::Work::addPlace(RedactedPlace::Reason reason, const detail::MediaPlace& place) {
-    places_.push_back({reason, place.path, place.offset, place.size});
-    blanks_.insert(blanks_.end(), place.blanks.begin(), place.blanks.end());
-}
-
-void RecordingRedactor::Work::choosePlaces() {
-    for (const detail::MediaPlace& place : media_.places) {
-        const bool isText = place.use == detail::MediaPlace::Use::Text;
-        if (isText ? redaction_.removesChapters : redaction_.blanksUnknown)
-            addPlace(isText ? RedactedPlace::Text : RedactedPlace::Unknown, place);
-    }
-    if (redaction_.removesCreator && isMovie())
-        chooseCreator();
-    std::stable_sort(places_.begin(), places_.end(),
-                     [](const auto& left, const auto& right) { return left.offset < right.offset; });
-    std::uint64_t end = 0; // of the outermost place; what is inside goes with it
-    std::erase_if(places_, [&end](const RedactedPlace& place) {
-        const bool isInside = place.offset < end;
-        end = std::max(end, place.offset + place.size);
-        return isInside;
-    });
-}
-
-void RecordingRedactor::Work::chooseCreator() {
-    const ZCAPHeader info = detail::neutralRecordingInfo();
-    const std::string neutral(reinterpret_cast<const char*>(&info), sizeof info);
-    for (const ContainerItem& item : items_) {
-        if (!item.holdsRecordingInfo())
-            continue;
-        std::string head = item.payloadSize() >= neutral.size() ? neutral : std::string();
-        std::string stored(head.size(), '\0');
-        file_.read(item.payloadOffset(), stored);
-        if (item.payloadSize() > 0 && (stored != head || item.payloadSize() != head.size()))
-            addPlace(RedactedPlace::Creator, {{},
-                                              item.type.text(),
-                                              item.offset,
-                                              item.size,
-                                              {{item.payloadOffset(), item.payloadSize(), std::move(head)}}});
-    }
-}
-
-void RecordingRedactor::Work::prepare() {
-    if (check_)
-        return;
-    if (container() != Container::RawStream)
-        requireWholeContainer();
-    collectTexts();
-    check_.emplace(redaction_, streamRedaction_, texts_);
-    check_->requireNoTextStays(media_);
-    if (container() != Container::RawStream)
-        requireNothingMisplaced();
-}
-
-/// A text that one stream makes a secret is hidden in every stream, and in every text that contains it if it is long.
-void RecordingRedactor::Work::collectTexts() {
-    for (const detail::StreamPart& stream : streams_)
-        collectRedactedTexts(stream.bytes, redaction_.streams, texts_);
-    streamRedaction_ = redaction_.streams;
-    hiddenTexts_.emplace(texts_.hidden, redaction_.spellings);
-    if (!redaction_.streams.removedTimes.empty() || redaction_.streams.hidesText)
-        streamRedaction_.hidesText = [this](const std::string& text) {
-            const auto& asked = redaction_.streams.hidesText;
-            return text != s_hiddenText && (hiddenTexts_->isIn(text) || (asked && asked(text)));
-        };
-    if (!redaction_.removesCreator)
-        return;
-    for (const ZCAPHeader& info : readRecordingInfo(file_, container()))
-        for (const std::string& text : {info.creator.name(), info.creator.version(), info.creator.platformVersion()})
-            if (!text.empty() && text != CreatorAttributes::platformNameMac())
-                texts_.removed.insert(text);
-}
-
-void RecordingRedactor::Work::requireWholeContainer() {
-    const RepairPlan plan = isMovie() ? planRepair(file_) : RepairPlan();
-    if (plan.state == RepairPlan::Repairable)
-        throw RedactionError(Reason::Repairable, plan.finding);
-    const std::uint64_t end = items_.empty() ? 0 : items_.back().end();
-    const bool fillsFile = end == total_ || (!isMovie() && padded(end) == total_);
-    if (plan.state == RepairPlan::Unrepairable || !fillsFile)
-        throw RedactionError(Reason::Damaged, plan.finding.empty() ? "its parts do not fill the file" : plan.finding);
-}
-
-/// A stream in a place that is copied as it is would stay in the copy.
-void RecordingRedactor::Work::requireNothingMisplaced() {
-    StreamSalvage salvage(file_, container(), [this](std::uint64_t done) { progress_(Step::Searching, done, total_); });
-    const SalvageReport report = salvage.run();
-    if (report.hasMore)
-        throw RedactionError(Reason::MisplacedStream,
-                             "has more than " + std::to_string(SalvageReport::s_maximumStreams) +
-                                 " places that look like streams, and not all of them could be looked into");
-    for (const SalvagedStream& stream : report.streams) {
-        if (isCopied(stream.offset))
-            throw RedactionError(Reason::MisplacedStream, metaDataKindName(stream.header.uuid) + " at offset " +
-                                                              std::to_string(stream.offset) +
-                                                              " is outside of the metadata and would stay in the copy");
-        unreachable_ += stream.origin == SalvagedStream::Reachable ? 0 : 1;
-    }
-}
-
-bool RecordingRedactor::Work::isCopied(std::uint64_t offset) const {
-    return mediaCopy_->isKept(offset) && std::none_of(items_.begin(), items_.end(), [offset](const auto& item) {
-               return item.holdsMetaData() && item.offset <= offset && offset < item.end();
-           });
-}
-
-/// Whether something follows whose place may be known to the media.
-bool RecordingRedactor::Work::isBeforeMedia(std::size_t item) const {
-    return std::any_of(items_.begin() + static_cast<std::ptrdiff_t>(item), items_.end(),
-                       [](const auto& next) { return !next.holdsMetaData() && !next.holdsRecordingInfo(); });
-}
-
-RedactedRecording RecordingRedactor::Work::result(std::vector<RedactedStream> streams) const {
-    return {std::move(streams), places_, unreachable_};
-}
-
-RedactedRecording RecordingRedactor::Work::preview() {
-    prepare();
-    std::vector<RedactedStream> streams;
-    for (const detail::StreamPart& stream : streams_) {
-        detail::NullOutput nowhere;
-        streams.push_back(redact(stream, nowhere));
-    }
-    return result(std::move(streams));
-}
-
-RedactedRecording RecordingRedactor::Work::write(const FileLocation& copy) {
-    prepare();
-    std::ofstream out;
-    fileOpen(out, utf8Path(copy).c_str(), std::ios::binary | std::ios::trunc);
-    if (!out.is_open())
-        failToWrite();
-    std::vector<RedactedStream> streams = writeContents(out);
-    finish(out, copy);
-    std::ifstream written;
-    fileOpen(written, utf8Path(copy).c_str(), std::ios::binary);
-    if (!written.is_open())
-        throw RedactionError(Reason::CannotWrite, std::string("cannot be read back: ") + std::strerror(errno));
-    const std::uint64_t size = ByteSource::stream(written).size();
-    std::uint64_t done = 0;
-    check_->requireClean(written, container(), [&](std::uint64_t bytes) {
-        done += bytes;
-        progress_(Step::Checking, done, size);
-    });
-    return result(std::move(streams));
-}
-
-RedactedStream RecordingRedactor::Work::redact(const detail::StreamPart& stream, std::ostream& out) const {
-    RedactedStream redacted = redactStream(stream.bytes, streamRedaction_, out);
-    redacted.bytesLeftOut += stream.declared - stream.bytes.size();
-    redacted.header.uuid = stream.type;
-    return redacted;
-}
-
-std::vector<RedactedStream> RecordingRedactor::Work::writeContents(std::ostream& out) {
-    if (container() == Container::RawStream)
-        return writeStreamFile(out);
-    writeMedia(out);
-    try {
-        return writeMetaData(out);
-    } catch (const std::length_error& error) {
-        throw RedactionError(Reason::TooLarge, error.what());
-    }
-}
-
-std::vector<RedactedStream> RecordingRedactor::Work::writeStreamFile(std::ostream& out) const {
-    std::vector<RedactedStream> streams;
-    for (const detail::StreamPart& stream : streams_)
-        streams.push_back(redact(stream, out));
-    if (streams.empty() || streams.front().removal != RedactedStream::Kept)
-        throw RedactionError(Reason::NothingLeft, "nothing would be left of it");
-    return streams;
-}
-
-std::vector<RedactedStream> RecordingRedactor::Work::writeMetaData(std::ostream& out) const {
-    std::vector<RedactedStream> streams;
-    MetaDataSection section(out, container());
-    for (const detail::StreamPart& stream : streams_)
-        section.add([&](std::ostream& output) {
-            streams.push_back(redact(stream, output));
-            return streams.back().removal == RedactedStream::Kept;
-        });
-    section.finish();
-    return streams;
-}
-
-/// Everything but the metadata, which leaves free space if media follow it.
-void RecordingRedactor::Work::writeMedia(std::ostream& out) {
-    std::uint64_t done = 0;
-    const auto advance = [&](std::uint64_t bytes) {
-        done += bytes;
-        progress_(Step::Copying, done, total_);
-    };
-    for (std::size_t i = 0; i < items_.size(); ++i) {
-        const ContainerItem& item = items_[i];
-        if (!item.holdsMetaData())
-            mediaCopy_->copy(item.offset, item.size, out, advance);
-        else if (isBeforeMedia(i))
-            writeBlank(out, item);
-        if (!isMovie())
-            out.seekp(static_cast<std::streamoff>(offsetOf(out) % 2), std::ios::cur);
-    }
-}
-
-void RecordingRedactor::Work::writeBlank(std::ostream& out, const ContainerItem& item) const {
-    const auto end = static_cast<std::streamoff>(offsetOf(out) + item.size);
-    if (!isMovie())
-        writeBytes(out, detail::chunkHeader(detail::s_junkChunk, static_cast<std::uint32_t>(item.payloadSize())));
-    else if (item.size > s_most32)
-        writeBytes(out, detail::extendedAtomHeader(detail::s_freeAtom, item.size));
-    else
-        writeBytes(out, detail::atomHeader(detail::s_freeAtom, static_cast<std::uint32_t>(item.size)));
-    out.seekp(end);
-}
 
 RecordingRedactor::RecordingRedactor(std::istream& recording, Container::Type type, RecordingRedaction redaction,
                                      Progress progress)

@@ -83,9 +83,47 @@ public:
     Save(const FileLocation& movie, const SafeMovieSave::Progress& progress)
         : name_(utf8Path(movie)), progress_(progress), file_(movie) {}
 
-    RepairPlan repair();
-    AttachResult attach(const AttachPlan& plan, SafeMovieSave::FragmentIndex index);
-    StampResult stamp(const ZCAPHeader& info, SafeMovieSave::FragmentIndex index);
+    RepairPlan repair() {
+        const ByteSource movie = file_.bytes();
+        RepairPlan plan = planSave(movie, name_);
+        if (movie.size() == 0)
+            fail("is empty");
+        if (plan.state == RepairPlan::Unrepairable)
+            fail(plan.finding);
+        file_.apply(plan.changes);
+        return plan;
+    }
+
+    AttachResult attach(const AttachPlan& plan, SafeMovieSave::FragmentIndex index) {
+        AttachResult result{repair(), {}, FragmentIndexState::Absent};
+        plan.requireFor(file_.bytes(), name_);
+        for (const auto& [stream, bytes] : plan.streams())
+            total_ += 2 * stream.bytes; // written, and read back
+        file_.beginAtom(detail::s_metaDataAtom);
+        for (const AttachPlan::Stream& stream : plan.streams())
+            result.streams.push_back(append(stream));
+        file_.endAtom();
+        result.fragmentIndex = treat(index);
+        requireInPlace();
+        const FoundStreams found(file_.bytes());
+        for (std::size_t i = 0; i < result.streams.size(); ++i)
+            verify(result.streams[i], plan.streams()[i].bytes, found);
+        return result;
+    }
+
+    StampResult stamp(const ZCAPHeader& info, SafeMovieSave::FragmentIndex index) {
+        StampResult result{repair(), {}, FragmentIndexState::Absent};
+        file_.beginAtom(detail::s_recordingInfoAtom);
+        file_.append({reinterpret_cast<const char*>(&info), sizeof info});
+        file_.endAtom();
+        result.fragmentIndex = treat(index);
+        requireInPlace();
+        const auto infos = readRecordingInfo(file_.bytes(), Container::QuickTime);
+        if (infos.empty() || std::memcmp(&infos.back(), &info, sizeof info) != 0)
+            fail("does not show its recording info to a reader");
+        result.info = infos.back();
+        return result;
+    }
 
     /// Runs `work`, and undoes what it did if it throws.
     template <class Work>
@@ -111,15 +149,85 @@ private:
             fail("was removed or replaced by another program meanwhile");
     }
 
-    AttachedStream append(const AttachPlan::Stream& stream);
-    void verify(const AttachedStream& written, const ByteSource& bytes, const FoundStreams& found);
-    FragmentIndexState treat(SafeMovieSave::FragmentIndex index);
-    void moveToEnd(const ContainerItem& index);
-    void undo(const char* reason);
+    AttachedStream append(const AttachPlan::Stream& stream) {
+        AttachedStream written = stream.stream;
+        file_.append(
+            detail::extendedAtomHeader(detail::s_streamAtom, detail::s_extendedAtomHeaderSize + written.bytes));
+        written.offset = file_.end();
+        inPieces(stream.bytes, written.bytes, written.name,
+                 [&](std::uint64_t, std::span<const char> piece) { file_.append(piece); });
+        return written;
+    }
+
+    void verify(const AttachedStream& written, const ByteSource& bytes, const FoundStreams& found) {
+        const auto place = found.placeOf(written.type);
+        if (place.offset != written.offset || place.length != written.bytes)
+            fail("does not show its stream of the kind " + metaDataKindName(written.type) + " at offset " +
+                 std::to_string(written.offset) + " to a reader");
+        const ByteSource movie = file_.bytes();
+        std::vector<char> stored(s_pieceSize);
+        inPieces(bytes, written.bytes, written.name, [&](std::uint64_t position, std::span<const char> piece) {
+            const std::uint64_t offset = written.offset + position;
+            if (movie.read(offset, std::span(stored).first(piece.size())) != piece.size() ||
+                std::memcmp(piece.data(), stored.data(), piece.size()) != 0)
+                fail("does not hold what was written at offset " + std::to_string(offset));
+        });
+    }
+
+    FragmentIndexState treat(SafeMovieSave::FragmentIndex index) {
+        std::optional<ContainerItem> found;
+        ItemWalk atoms(file_.bytes(), Container::QuickTime);
+        while (const auto atom = atoms.next())
+            if (atom->type == detail::s_fragmentIndexAtom)
+                found = atom;
+        if (!found)
+            return FragmentIndexState::Absent;
+        if (index == SafeMovieSave::FragmentIndex::Leave)
+            return FragmentIndexState::NotAtEnd;
+        moveToEnd(*found);
+        return FragmentIndexState::AtEnd;
+    }
+
+    /// Puts a copy at the end of the file, and then takes the type of the old one away. If the program ends in between,
+    /// both are good.
+    void moveToEnd(const ContainerItem& index) {
+        const std::uint64_t start = file_.end();
+        total_ += index.size;
+        const ByteSource old = file_.bytes().part(index.offset, index.size);
+        inPieces(old, index.size, name_, [&](std::uint64_t position, std::span<char> piece) {
+            if (position == 0) // open-ended until it is whole
+                std::copy_n(detail::atomHeader(detail::s_freeAtom, 0).begin(), detail::s_atomHeaderSize, piece.begin());
+            file_.append(piece);
+        });
+        file_.sync();
+        file_.writeAppended(start, detail::atomHeader(detail::s_fragmentIndexAtom, index.sizeField));
+        file_.apply({{index.offset + sizeof index.sizeField, detail::s_fragmentIndexAtom.text(),
+                      detail::s_freeAtom.text(), "The old index of the fragments becomes a 'free' atom."}});
+    }
+
+    void undo(const char* reason) {
+        try {
+            file_.undo();
+        } catch (const std::system_error& error) {
+            fail(std::string(reason) + "; and it could not be made what it was: " + error.what(),
+                 SaveError::Reason::NotUndone);
+        }
+    }
 
     /// Calls `visit` with every piece of a source and its position. Throws `SaveError` if the source ends early.
     template <class Visit>
-    void inPieces(const ByteSource& source, std::uint64_t size, const std::string& name, Visit visit);
+    void inPieces(const ByteSource& source, std::uint64_t size, const std::string& name, Visit visit) {
+        std::vector<char> piece(s_pieceSize);
+        for (std::uint64_t position = 0; position < size; position += piece.size()) {
+            piece.resize(static_cast<std::size_t>(std::min<std::uint64_t>(s_pieceSize, size - position)));
+            if (source.read(position, piece) != piece.size())
+                throw SaveError(name, "cannot be read at offset " + std::to_string(position));
+            visit(position, std::span<char>(piece));
+            done_ += piece.size();
+            if (progress_)
+                progress_(done_, total_);
+        }
+    }
 
     std::string name_;
     SafeMovieSave::Progress progress_;
@@ -127,126 +235,6 @@ private:
     std::uint64_t done_ = 0;
     std::uint64_t total_ = 0;
 };
-
-RepairPlan Save::repair() {
-    const ByteSource movie = file_.bytes();
-    RepairPlan plan = planSave(movie, name_);
-    if (movie.size() == 0)
-        fail("is empty");
-    if (plan.state == RepairPlan::Unrepairable)
-        fail(plan.finding);
-    file_.apply(plan.changes);
-    return plan;
-}
-
-template <class Visit>
-void Save::inPieces(const ByteSource& source, std::uint64_t size, const std::string& name, Visit visit) {
-    std::vector<char> piece(s_pieceSize);
-    for (std::uint64_t position = 0; position < size; position += piece.size()) {
-        piece.resize(static_cast<std::size_t>(std::min<std::uint64_t>(s_pieceSize, size - position)));
-        if (source.read(position, piece) != piece.size())
-            throw SaveError(name, "cannot be read at offset " + std::to_string(position));
-        visit(position, std::span<char>(piece));
-        done_ += piece.size();
-        if (progress_)
-            progress_(done_, total_);
-    }
-}
-
-AttachedStream Save::append(const AttachPlan::Stream& stream) {
-    AttachedStream written = stream.stream;
-    file_.append(detail::extendedAtomHeader(detail::s_streamAtom, detail::s_extendedAtomHeaderSize + written.bytes));
-    written.offset = file_.end();
-    inPieces(stream.bytes, written.bytes, written.name,
-             [&](std::uint64_t, std::span<const char> piece) { file_.append(piece); });
-    return written;
-}
-
-void Save::verify(const AttachedStream& written, const ByteSource& bytes, const FoundStreams& found) {
-    const auto place = found.placeOf(written.type);
-    if (place.offset != written.offset || place.length != written.bytes)
-        fail("does not show its stream of the kind " + metaDataKindName(written.type) + " at offset " +
-             std::to_string(written.offset) + " to a reader");
-    const ByteSource movie = file_.bytes();
-    std::vector<char> stored(s_pieceSize);
-    inPieces(bytes, written.bytes, written.name, [&](std::uint64_t position, std::span<const char> piece) {
-        const std::uint64_t offset = written.offset + position;
-        if (movie.read(offset, std::span(stored).first(piece.size())) != piece.size() ||
-            std::memcmp(piece.data(), stored.data(), piece.size()) != 0)
-            fail("does not hold what was written at offset " + std::to_string(offset));
-    });
-}
-
-/// Puts a copy at the end of the file, and then takes the type of the old one away. If the program ends in between,
-/// both are good.
-void Save::moveToEnd(const ContainerItem& index) {
-    const std::uint64_t start = file_.end();
-    total_ += index.size;
-    const ByteSource old = file_.bytes().part(index.offset, index.size);
-    inPieces(old, index.size, name_, [&](std::uint64_t position, std::span<char> piece) {
-        if (position == 0) // open-ended until it is whole
-            std::copy_n(detail::atomHeader(detail::s_freeAtom, 0).begin(), detail::s_atomHeaderSize, piece.begin());
-        file_.append(piece);
-    });
-    file_.sync();
-    file_.writeAppended(start, detail::atomHeader(detail::s_fragmentIndexAtom, index.sizeField));
-    file_.apply({{index.offset + sizeof index.sizeField, detail::s_fragmentIndexAtom.text(), detail::s_freeAtom.text(),
-                  "The old index of the fragments becomes a 'free' atom."}});
-}
-
-FragmentIndexState Save::treat(SafeMovieSave::FragmentIndex index) {
-    std::optional<ContainerItem> found;
-    ItemWalk atoms(file_.bytes(), Container::QuickTime);
-    while (const auto atom = atoms.next())
-        if (atom->type == detail::s_fragmentIndexAtom)
-            found = atom;
-    if (!found)
-        return FragmentIndexState::Absent;
-    if (index == SafeMovieSave::FragmentIndex::Leave)
-        return FragmentIndexState::NotAtEnd;
-    moveToEnd(*found);
-    return FragmentIndexState::AtEnd;
-}
-
-AttachResult Save::attach(const AttachPlan& plan, SafeMovieSave::FragmentIndex index) {
-    AttachResult result{repair(), {}, FragmentIndexState::Absent};
-    plan.requireFor(file_.bytes(), name_);
-    for (const auto& [stream, bytes] : plan.streams())
-        total_ += 2 * stream.bytes; // written, and read back
-    file_.beginAtom(detail::s_metaDataAtom);
-    for (const AttachPlan::Stream& stream : plan.streams())
-        result.streams.push_back(append(stream));
-    file_.endAtom();
-    result.fragmentIndex = treat(index);
-    requireInPlace();
-    const FoundStreams found(file_.bytes());
-    for (std::size_t i = 0; i < result.streams.size(); ++i)
-        verify(result.streams[i], plan.streams()[i].bytes, found);
-    return result;
-}
-
-StampResult Save::stamp(const ZCAPHeader& info, SafeMovieSave::FragmentIndex index) {
-    StampResult result{repair(), {}, FragmentIndexState::Absent};
-    file_.beginAtom(detail::s_recordingInfoAtom);
-    file_.append({reinterpret_cast<const char*>(&info), sizeof info});
-    file_.endAtom();
-    result.fragmentIndex = treat(index);
-    requireInPlace();
-    const auto infos = readRecordingInfo(file_.bytes(), Container::QuickTime);
-    if (infos.empty() || std::memcmp(&infos.back(), &info, sizeof info) != 0)
-        fail("does not show its recording info to a reader");
-    result.info = infos.back();
-    return result;
-}
-
-void Save::undo(const char* reason) {
-    try {
-        file_.undo();
-    } catch (const std::system_error& error) {
-        fail(std::string(reason) + "; and it could not be made what it was: " + error.what(),
-             SaveError::Reason::NotUndone);
-    }
-}
 
 /// Runs `work` and adds the name to errors of the platform.
 template <class Work>

@@ -2,8 +2,9 @@
 
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
-#include "ZULMetaDataBridge/Source/Redaction/RemovedTimes.h"
+#include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 
+#include <algorithm>
 #include <cmath>
 #include <limits>
 #include <map>
@@ -30,6 +31,41 @@ constexpr TimeRole roleOf() {
     return std::same_as<typename Kind::Value, std::string> ? TimeRole::Text : TimeRole::State;
 }
 
+/// The times that a redaction removes, as ranges that neither overlap nor touch.
+class RemovedTimes {
+public:
+    explicit RemovedTimes(std::vector<TimeRange> ranges) {
+        std::erase_if(ranges, [](const TimeRange& range) { return !(range.from <= range.to); });
+        std::sort(ranges.begin(), ranges.end(),
+                  [](const auto& left, const auto& right) { return left.from < right.from; });
+        for (const TimeRange& range : ranges) {
+            if (!ranges_.empty() && range.from <= ranges_.back().to)
+                ranges_.back().to = std::max(ranges_.back().to, range.to);
+            else
+                ranges_.push_back(range);
+        }
+    }
+
+    /// Returns whether an entry of this time goes. An entry whose time is not a number may be of any time.
+    bool isRemoved(double time) const { return !ranges_.empty() && (std::isnan(time) || rangeAt(time)); }
+
+    /// Returns the range that holds the time, or null.
+    const TimeRange* rangeAt(double time) const {
+        const auto found = std::find_if(ranges_.begin(), ranges_.end(),
+                                        [time](const auto& range) { return range.from <= time && time <= range.to; });
+        return found == ranges_.end() ? nullptr : &*found;
+    }
+
+    /// Returns whether a removed time is at or after `begin` and before `end`.
+    bool meets(double begin, double end) const {
+        return std::any_of(ranges_.begin(), ranges_.end(),
+                           [=](const auto& range) { return begin <= range.to && range.from < end; });
+    }
+
+private:
+    std::vector<TimeRange> ranges_;
+};
+
 bool isSecret(const std::string& text) {
     return !text.empty() && text != s_hiddenText;
 }
@@ -37,7 +73,7 @@ bool isSecret(const std::string& text) {
 /// Finds the texts that were in force inside a removed range.
 class HeldTexts {
 public:
-    HeldTexts(const detail::RemovedTimes& times, std::set<std::string>& texts) : times_(times), texts_(texts) {}
+    HeldTexts(const RemovedTimes& times, std::set<std::string>& texts) : times_(times), texts_(texts) {}
 
     void add(const TimedValue<std::string>& entry) {
         endAt(entry.time);
@@ -57,7 +93,7 @@ private:
         return times_.isRemoved(last_->time) || times_.meets(last_->time, end);
     }
 
-    const detail::RemovedTimes& times_;
+    const RemovedTimes& times_;
     std::set<std::string>& texts_;
     std::optional<TimedValue<std::string>> last_;
 };
@@ -83,9 +119,7 @@ public:
         entries_.erase(found);
         if (cursor.imageDataSize > 0)
             return cursor;
-        std::string bytes(static_cast<std::size_t>(entry.size), '\0');
-        bytes.resize(stream_.read(entry.offset, bytes));
-        auto pictured = decodeEntry<CursorImage>(bytes, version);
+        auto pictured = decodeEntry<CursorImage>(detail::readAll(stream_.part(entry.offset, entry.size)), version);
         if (!pictured)
             return cursor;
         pictured->value.flags = cursor.flags;
@@ -211,7 +245,7 @@ private:
     }
 
     const Redaction& redaction_;
-    detail::RemovedTimes times_;
+    RemovedTimes times_;
     const std::set<std::string>& heldTexts_;
     RemovedPictures pictures_;
     RedactedStream& result_;
@@ -241,19 +275,6 @@ RedactedStream::Removal removalOf(const std::optional<MetaDataHeader>& header, c
     return isLegible ? RedactedStream::Kept : RedactedStream::Undecodable;
 }
 
-void writeHeader(const MetaDataHeader& header, std::ostream& out) {
-    out.write(reinterpret_cast<const char*>(&header), sizeof header);
-}
-
-/// Calls `visit` with each entry and its bytes until it returns false. Returns where the walk ended.
-template <class Visit>
-std::uint64_t walk(StreamEntries& entries, Visit visit) {
-    while (const auto entry = entries.next())
-        if (!visit(*entry, entries.bytesOf(*entry)))
-            return entry->offset;
-    return entries.wholeBytes();
-}
-
 /// Calls `visit` with each decoded entry of a stream of texts or of lists of texts.
 template <class Visit>
 void visitTexts(StreamEntries& entries, Visit visit) {
@@ -262,7 +283,7 @@ void visitTexts(StreamEntries& entries, Visit visit) {
     RecordedKinds::visit(entries.header()->uuid, [&]<class Kind>() {
         using Value = typename Kind::Value;
         if constexpr (OneOf<Value, std::string, std::list<std::string>>)
-            walk(entries, [&](const StreamEntry&, std::string_view bytes) {
+            walkEntries(entries, [&](const StreamEntry&, std::string_view bytes) {
                 const auto decoded = decodeEntry<Value>(bytes, entries.header()->version);
                 if (decoded)
                     visit(*decoded);
@@ -275,7 +296,7 @@ std::set<std::string> textsHeldInside(const ByteSource& stream, const Redaction&
     std::set<std::string> texts;
     if (redaction.removedTimes.empty())
         return texts;
-    const detail::RemovedTimes times(redaction.removedTimes);
+    const RemovedTimes times(redaction.removedTimes);
     HeldTexts held(times, texts);
     StreamEntries entries(stream);
     visitTexts(entries, [&]<class Value>(const TimedValue<Value>& decoded) {
@@ -289,7 +310,7 @@ std::set<std::string> textsHeldInside(const ByteSource& stream, const Redaction&
 void reportRemovedStream(StreamEntries& entries, const Redaction& redaction) {
     if (!redaction.onEntry || !entries.header() || !isDecodable(*entries.header()))
         return;
-    walk(entries, [&](const StreamEntry&, std::string_view bytes) {
+    walkEntries(entries, [&](const StreamEntry&, std::string_view bytes) {
         const auto time = timeOfEntry(*entries.header(), bytes);
         if (time)
             redaction.onEntry({RedactedEntry::Removed, *entries.header(), *time, bytes});
@@ -330,18 +351,18 @@ RedactedStream redactStream(const ByteSource& stream, const Redaction& redaction
         reportRemovedStream(entries, redaction);
         return result;
     }
-    writeHeader(result.header, out);
+    out.write(reinterpret_cast<const char*>(&result.header), sizeof result.header);
     const std::set<std::string> heldTexts = textsHeldInside(stream, redaction);
     std::uint64_t end = s_metaDataHeaderSize;
     const bool isWalked = isDecodable(result.header) && RecordedKinds::visit(result.header.uuid, [&]<class Kind>() {
                               EntryRedactor<Kind> redactor(redaction, heldTexts, stream, result, out);
-                              end = walk(entries, [&](const StreamEntry& entry, std::string_view bytes) {
+                              end = walkEntries(entries, [&](const StreamEntry& entry, std::string_view bytes) {
                                   return redactor.copy(entry, bytes);
                               });
                               redactor.finish();
                           });
     if (!isWalked)
-        end = walk(entries, [&](const StreamEntry&, std::string_view bytes) {
+        end = walkEntries(entries, [&](const StreamEntry&, std::string_view bytes) {
             out.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
             ++result.entries;
             return true;

@@ -8,6 +8,7 @@
 #include <cstring>
 #include <string>
 #include <string_view>
+#include <utility>
 
 namespace ZULMetaData {
 
@@ -37,16 +38,22 @@ public:
         if (bytes.size() < timeOffset_ + sizeof(double))
             return false;
         const double time = timeIn(bytes) + retiming_.shift;
-        if (!retiming_.trimmedTo || (time >= 0 && time <= *retiming_.trimmedTo))
-            write(bytes, time);
-        else if (time < 0)
+        if (!retiming_.trimmedTo || (time >= 0 && time <= *retiming_.trimmedTo)) {
+            writeHeld();
+            writeBytes(bytes, time);
+        } else if (time < 0) {
             takeEarly(bytes);
-        else
+        } else {
             ++result_.entriesRemoved;
+        }
         return true;
     }
 
-    void finish() { writeHeld(); }
+    /// Writes the entry that is held, because it is in force at 0. Call after the last entry.
+    void writeHeld() {
+        if (!held_.empty())
+            writeBytes(std::exchange(held_, {}), 0);
+    }
 
 private:
     double timeIn(std::string_view bytes) const {
@@ -76,19 +83,6 @@ private:
         return cursor && cursor->value.imageDataSize > 0;
     }
 
-    void writeHeld() {
-        if (held_.empty())
-            return;
-        const std::string bytes = std::move(held_);
-        held_.clear();
-        writeBytes(bytes, 0);
-    }
-
-    void write(std::string_view bytes, double time) {
-        writeHeld();
-        writeBytes(bytes, time);
-    }
-
     void writeBytes(std::string_view bytes, double time) {
         std::string copy(bytes);
         if (retiming_.shift != 0 || timeIn(bytes) < 0)
@@ -108,15 +102,6 @@ private:
     std::string held_; ///< the last entry before 0, until one after it shows that it is in force at 0
 };
 
-/// The description of the machine stands at 0, whenever the recording began.
-void copyEntries(StreamEntries& entries, RetimedStream& result, std::ostream& out) {
-    while (const auto entry = entries.next()) {
-        const std::string_view bytes = entries.bytesOf(*entry);
-        out.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
-        ++result.entries;
-    }
-}
-
 } // namespace
 
 RetimedStream retimeStream(const ByteSource& stream, const Retiming& retiming, std::ostream& out) {
@@ -128,24 +113,21 @@ RetimedStream retimeStream(const ByteSource& stream, const Retiming& retiming, s
     }
     result.header = *entries.header();
     const auto timeOffset = timeOffsetIn(result.header);
+    // The description of the machine stands at 0, whenever the recording began.
     const bool hasTimes = result.header.uuid != s_systemDataUUID;
     result.isReadable = !hasTimes || timeOffset.has_value();
     if (!result.isReadable)
         return result;
     out.write(reinterpret_cast<const char*>(&result.header), sizeof result.header);
-    std::uint64_t end = s_metaDataHeaderSize;
-    if (hasTimes) {
-        Retimer retimer(retiming, *timeOffset, result, out);
-        while (const auto entry = entries.next()) {
-            if (!retimer.take(entries.bytesOf(*entry)))
-                break;
-            end = entry->end();
-        }
-        retimer.finish();
-    } else {
-        copyEntries(entries, result, out);
-        end = entries.wholeBytes();
-    }
+    Retimer retimer(retiming, timeOffset.value_or(0), result, out);
+    const std::uint64_t end = walkEntries(entries, [&](const StreamEntry&, std::string_view bytes) {
+        if (hasTimes)
+            return retimer.take(bytes);
+        out.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+        ++result.entries;
+        return true;
+    });
+    retimer.writeHeld();
     result.bytesLeftOut = stream.size() - end;
     return result;
 }

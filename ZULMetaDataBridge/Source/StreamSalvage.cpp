@@ -10,9 +10,7 @@
 #include <array>
 #include <cmath>
 #include <cstring>
-#include <iterator>
 #include <string>
-#include <string_view>
 #include <utility>
 
 namespace ZULMetaData {

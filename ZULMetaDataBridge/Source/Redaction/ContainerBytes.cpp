@@ -4,7 +4,6 @@
 #include "ZULMetaDataBridge/Source/EntryTexts.h"
 #include "ZULMetaDataBridge/Source/Redaction/TextSearch.h"
 
-#include <algorithm>
 #include <cstring>
 
 namespace ZULMetaData::detail {
@@ -14,26 +13,10 @@ namespace {
 constexpr std::size_t s_shortestRun = 4;
 constexpr std::uint64_t s_blankPiece = 1 << 18;
 
-bool isPrintable(char byte) {
-    const auto value = static_cast<unsigned char>(byte);
-    return value >= 0x20 && value != 0x7f && (value < 0x80 || value >= 0xa0);
-}
-
 /// A byte that can be part of a text: anything but a control character.
 bool isTextByte(char byte) {
     const auto value = static_cast<unsigned char>(byte);
     return value >= 0x20 && value != 0x7f;
-}
-
-/// `typeOffset` is where the four characters of the type stand in the header.
-MediaPlace blanked(MediaPlace::Use use, const std::string& path, const ContainerItem& item, std::uint64_t typeOffset,
-                   FourCC type) {
-    const std::string characters = type.text();
-    MediaPlace place{use, path, item.offset, item.size, {}};
-    place.blanks.push_back({item.offset + typeOffset, characters.size(), characters});
-    if (item.payloadSize() > 0)
-        place.blanks.push_back({item.payloadOffset(), item.payloadSize(), {}});
-    return place;
 }
 
 } // namespace
@@ -42,10 +25,14 @@ bool isZero(std::string_view bytes) {
     return bytes.front() == 0 && std::memcmp(bytes.data(), bytes.data() + 1, bytes.size() - 1) == 0;
 }
 
-std::string readBytes(const ByteSource& file, std::uint64_t offset, std::uint64_t size, std::uint64_t limit) {
-    std::string bytes(static_cast<std::size_t>(std::min(size, limit)), '\0');
-    bytes.resize(file.read(offset, bytes));
+std::string readAll(const ByteSource& source) {
+    std::string bytes(static_cast<std::size_t>(source.size()), '\0');
+    bytes.resize(source.read(0, bytes));
     return bytes;
+}
+
+std::string readBytes(const ByteSource& file, std::uint64_t offset, std::uint64_t size, std::uint64_t limit) {
+    return readAll(file.part(offset, std::min(size, limit)));
 }
 
 std::uint64_t bigEndianAt(std::string_view bytes, std::size_t offset, std::size_t size) {
@@ -87,27 +74,45 @@ std::vector<std::string> textRuns(std::string_view bytes) {
 
 std::string shownType(const ContainerItem& item) {
     const std::string type = item.type.text();
-    return std::all_of(type.begin(), type.end(), isPrintable) ? textFromLatin1(type)
-                                                              : '#' + std::to_string(item.type.value);
+    const bool isPrintable = std::all_of(type.begin(), type.end(), [](char byte) {
+        const auto value = static_cast<unsigned char>(byte);
+        return isTextByte(byte) && (value < 0x80 || value >= 0xa0);
+    });
+    return isPrintable ? textFromLatin1(type) : '#' + std::to_string(item.type.value);
 }
 
-MediaPlace blankedAtom(MediaPlace::Use use, const std::string& path, const ContainerItem& atom) {
-    return blanked(use, path, atom, sizeof(std::uint32_t), s_freeAtom);
+std::string PlaceWalk::payloadOf(const ContainerItem& item) const {
+    return readBytes(file_, item.payloadOffset(), item.payloadSize());
 }
 
-MediaPlace blankedChunk(MediaPlace::Use use, const std::string& path, const ContainerItem& chunk) {
-    return blanked(use, path, chunk, 0, s_junkChunk);
+MediaPlace PlaceWalk::blanked(MediaPlace::Use use, const ContainerItem& item, const std::string& path) const {
+    const std::string type = (items_.isMovie() ? s_freeAtom : s_junkChunk).text();
+    MediaPlace place{use, path, item.offset, item.size, {}};
+    place.blanks.push_back({item.offset + (items_.isMovie() ? sizeof item.sizeField : 0), type.size(), type});
+    if (item.payloadSize() > 0)
+        place.blanks.push_back({item.payloadOffset(), item.payloadSize(), {}});
+    return place;
 }
 
-bool isBlank(const ByteSource& file, const ContainerItem& item) {
+void PlaceWalk::addPlace(MediaPlace::Use use, const ContainerItem& item, const std::string& path) {
+    places_.places.push_back(blanked(use, item, path));
+}
+
+void PlaceWalk::addUnused(const ContainerItem& item, const std::string& path) {
     for (std::uint64_t done = 0; done < item.payloadSize(); done += s_blankPiece) {
-        const std::string bytes = readBytes(file, item.payloadOffset() + done, item.payloadSize() - done, s_blankPiece);
+        const auto bytes = readBytes(file_, item.payloadOffset() + done, item.payloadSize() - done, s_blankPiece);
         if (bytes.empty())
-            break;
+            return;
         if (!isZero(bytes))
-            return false;
+            return addPlace(MediaPlace::Use::Unused, item, path);
     }
-    return true;
+}
+
+void PlaceWalk::addTexts(MediaText::Role role, const ContainerItem& item, const std::string& path,
+                         std::vector<std::string> texts) {
+    std::erase(texts, "");
+    if (!texts.empty())
+        places_.texts.push_back({role, path, item.offset, std::move(texts)});
 }
 
 } // namespace ZULMetaData::detail

@@ -27,8 +27,12 @@ bool isOneOf(FourCC type, const std::array<FourCC, size>& types) {
 /// Returns whether all bytes are zero; there must be at least one.
 bool isZero(std::string_view bytes);
 
+/// Returns all bytes that the source has, which must be few.
+std::string readAll(const ByteSource& source);
+
 /// Returns fewer bytes at the end of the file, and at most `limit`.
-std::string readBytes(const ByteSource& file, std::uint64_t offset, std::uint64_t size, std::uint64_t limit);
+std::string readBytes(const ByteSource& file, std::uint64_t offset, std::uint64_t size,
+                      std::uint64_t limit = s_longestRead);
 
 /// Returns 0 if the bytes do not reach that far.
 ///@{
@@ -48,13 +52,26 @@ std::vector<std::string> textRuns(std::string_view bytes);
 /// Returns an item's type as it can be shown: its characters, or a number if they are none.
 std::string shownType(const ContainerItem& item);
 
-/// Returns the place that an item takes; an atom becomes `free`, a chunk `JUNK`, and every byte after its header zero.
-///@{
-MediaPlace blankedAtom(MediaPlace::Use use, const std::string& path, const ContainerItem& atom);
-MediaPlace blankedChunk(MediaPlace::Use use, const std::string& path, const ContainerItem& chunk);
-///@}
+/// What the walks over movies and over RIFF files have in common.
+class PlaceWalk {
+protected:
+    PlaceWalk(const ByteSource& file, Container::Type type) : file_(file), items_(file, type) {}
 
-/// Returns whether every byte after an item's header is zero already.
-bool isBlank(const ByteSource& file, const ContainerItem& item);
+    std::string payloadOf(const ContainerItem& item) const;
+
+    /// Returns the place that an item takes; an atom becomes `free`, a chunk `JUNK`, and every byte after its header
+    /// zero.
+    MediaPlace blanked(MediaPlace::Use use, const ContainerItem& item, const std::string& path) const;
+    void addPlace(MediaPlace::Use use, const ContainerItem& item, const std::string& path);
+    void addUnused(const ContainerItem& item, const std::string& path); ///< unless it is blank already
+
+    /// Leaves out empty texts.
+    void addTexts(MediaText::Role role, const ContainerItem& item, const std::string& path,
+                  std::vector<std::string> texts);
+
+    const ByteSource& file_;
+    ItemWalk items_;
+    MediaPlaces places_;
+};
 
 } // namespace ZULMetaData::detail

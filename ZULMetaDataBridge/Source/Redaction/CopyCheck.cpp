@@ -3,10 +3,10 @@
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/RecordingInfo.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
-#include "ZULMetaDataBridge/Source/Redaction/NullOutput.h"
 
 #include <algorithm>
 #include <cstring>
+#include <fstream>
 
 namespace ZULMetaData::detail {
 
@@ -114,7 +114,7 @@ void CopyCheck::requireClean(std::istream& copy, Container::Type type,
 
 /// A redaction that is applied once more must find nothing to do.
 void CopyCheck::requireCleanStream(const StreamPart& stream) const {
-    NullOutput nowhere;
+    std::ofstream nowhere; // is not open and drops everything
     Redaction again = streams_;
     const std::string name = metaDataKindName(stream.type);
     again.onEntry = [&](const RedactedEntry& entry) {

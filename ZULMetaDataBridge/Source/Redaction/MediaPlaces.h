@@ -18,7 +18,11 @@ struct Blank {
     std::string head; ///< not longer than `size`
 
     std::uint64_t end() const { return offset + size; }
+    bool covers(std::uint64_t position) const { return offset <= position && position < end(); }
 };
+
+/// Returns the file as it is with the blanks. A blank inside of an earlier, larger one has no effect.
+ByteSource withBlanks(const ByteSource& file, std::vector<Blank> blanks);
 
 /// A part of the container that can be blanked as a whole.
 struct MediaPlace {

@@ -15,12 +15,12 @@ constexpr std::array<FourCC, 10> s_textChunks{"bext", "iXML", "axml", "aXML", "_
                                               "id3 ", "ID3 ", "DISP", "strn", "Titl"};
 constexpr std::array<FourCC, 4> s_unusedChunks{"JUNK", "junk", "PAD ", "FLLR"};
 
-class RIFFWalk {
+class RIFFWalk : PlaceWalk {
 public:
-    explicit RIFFWalk(const ByteSource& file) : file_(file), chunks_(file, Container::Riff) {}
+    explicit RIFFWalk(const ByteSource& file) : PlaceWalk(file, Container::Riff) {}
 
     MediaPlaces run() {
-        forEach(chunks_, [this](const ContainerItem& item) {
+        forEach(items_, [this](const ContainerItem& item) {
             if (isOneOf(item.type, s_lists))
                 visit(item, shownType(item), 0);
             else if (!item.holdsMetaData())
@@ -40,25 +40,27 @@ private:
     }
 
     void visit(const ContainerItem& item, const std::string& path, int depth) {
-        if (isOneOf(item.type, s_lists))
+        if (isOneOf(item.type, s_lists)) {
             visitList(item, path, depth);
-        else if (isOneOf(item.type, s_textChunks))
-            addTexts(item, path);
-        else if (isOneOf(item.type, s_unusedChunks))
+        } else if (isOneOf(item.type, s_textChunks)) {
+            addPlace(MediaPlace::Use::Text, item, path);
+            addTextsOf(item, path);
+        } else if (isOneOf(item.type, s_unusedChunks)) {
             addUnused(item, path);
+        }
     }
 
     void visitList(const ContainerItem& item, const std::string& path, int depth) {
-        ItemWalk children = chunks_.inside(item);
+        ItemWalk children = items_.inside(item);
         children.moveTo(item.payloadOffset() + s_formSize);
-        const std::string formText = readBytes(file_, item.payloadOffset(), s_formSize, s_formSize);
+        const std::string formText = readBytes(file_, item.payloadOffset(), s_formSize);
         const FourCC form(static_cast<std::uint32_t>(bigEndianAt(formText, 0, s_formSize)));
         const std::string place = item.type == "LIST" ? path + ' ' + formText : path;
         if (form == "movi" || depth >= s_deepestLevel)
             return;
         const bool holdsTexts = item.type == "LIST" && isOneOf(form, s_textLists);
         if (holdsTexts)
-            places_.places.push_back(blankedChunk(MediaPlace::Use::Text, place, item));
+            addPlace(MediaPlace::Use::Text, item, place);
         forEach(children, [&](const ContainerItem& child) {
             const std::string childPath = place + '/' + shownType(child);
             if (holdsTexts)
@@ -68,32 +70,15 @@ private:
         });
     }
 
-    void addTexts(const ContainerItem& item, const std::string& path) {
-        places_.places.push_back(blankedChunk(MediaPlace::Use::Text, path, item));
-        addTextsOf(item, path);
-    }
-
     /// A chunk of a list of texts, and "strn", is one text; a label of a list "adtl" has the number of its mark before.
     void addTextsOf(const ContainerItem& item, const std::string& path) {
-        const std::string payload = readBytes(file_, item.payloadOffset(), item.payloadSize(), s_longestRead);
+        const std::string payload = payloadOf(item);
         const bool isLabel = item.type == "labl" || item.type == "note";
         const bool isText = isLabel || item.type == "strn" || path.find("LIST INFO/") != std::string::npos;
-        std::vector<std::string> texts =
-            isText ? std::vector{decodedText(part(payload, isLabel ? 4 : 0))} : textRuns(payload);
-        std::erase(texts, "");
         const auto role = item.type == "ISFT" ? MediaText::Role::Technical : MediaText::Role::Title;
-        if (!texts.empty())
-            places_.texts.push_back({role, path, item.offset, std::move(texts)});
+        addTexts(role, item, path,
+                 isText ? std::vector{decodedText(part(payload, isLabel ? 4 : 0))} : textRuns(payload));
     }
-
-    void addUnused(const ContainerItem& item, const std::string& path) {
-        if (!isBlank(file_, item))
-            places_.places.push_back(blankedChunk(MediaPlace::Use::Unused, path, item));
-    }
-
-    const ByteSource& file_;
-    ItemWalk chunks_;
-    MediaPlaces places_;
 };
 
 } // namespace

@@ -1,10 +1,10 @@
 #include "ZULMetaDataBridge/Source/Redaction/TextSearch.h"
 
+#include "SharedDependencies/UTF8.h"
 #include "ZULMetaDataBridge/Source/EntryTexts.h"
 #include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 
 #include <algorithm>
-#include <array>
 #include <cstring>
 
 namespace ZULMetaData::detail {
@@ -19,10 +19,6 @@ constexpr std::size_t s_filterSize = 1 << 20;    // bits
 constexpr std::size_t s_shortestWordBounded = 4; // characters
 constexpr std::size_t s_searchPiece = 1 << 20;   // bytes
 
-bool isContinuation(char byte) {
-    return (static_cast<unsigned char>(byte) & 0xc0) == 0x80;
-}
-
 /// The characters of a text in UTF-8; the bytes of any other.
 std::u32string charactersOf(const std::string& text) {
     std::u32string characters;
@@ -31,7 +27,7 @@ std::u32string charactersOf(const std::string& text) {
         const auto value = static_cast<unsigned char>(byte);
         if (!isText || value < 0x80)
             characters.push_back(value);
-        else if (isContinuation(byte))
+        else if (continuesCharacter(byte))
             characters.back() = characters.back() << 6 | (value & 0x3fU);
         else
             characters.push_back(value & (value < 0xe0 ? 0x1fU : value < 0xf0 ? 0x0fU : 0x07U));
@@ -44,25 +40,17 @@ bool isLong(const std::u32string& characters) {
            std::set<char32_t>(characters.begin(), characters.end()).size() >= s_leastDifferent;
 }
 
-std::u16string utf16(const std::u32string& characters) {
-    std::u16string units;
-    for (const char32_t character : characters) {
-        if (character < 0x10000) {
-            units.push_back(static_cast<char16_t>(character));
-            continue;
-        }
-        units.push_back(static_cast<char16_t>(0xd7c0 + (character >> 10)));
-        units.push_back(static_cast<char16_t>(0xdc00 + (character & 0x3ff)));
-    }
-    return units;
-}
-
-std::string bytesOf(const std::u16string& units, bool isBigEndian) {
+std::string utf16(const std::u32string& characters, bool isBigEndian) {
     std::string bytes;
-    for (const char16_t unit : units) {
+    const auto append = [&](char32_t unit) {
         const auto high = static_cast<char>(unit >> 8);
         const auto low = static_cast<char>(unit & 0xff);
         bytes.append({isBigEndian ? high : low, isBigEndian ? low : high});
+    };
+    for (const char32_t character : characters) {
+        if (character >= 0x10000)
+            append(0xd7c0 + (character >> 10));
+        append(character < 0x10000 ? character : 0xdc00 + (character & 0x3ff));
     }
     return bytes;
 }
@@ -105,14 +93,6 @@ bool isWordIn(const std::string& text, const std::string& within) {
     return false;
 }
 
-void appendUTF8(char32_t character, std::string& text) {
-    const int further = character < 0x80 ? 0 : character < 0x800 ? 1 : character < 0x10000 ? 2 : 3; // bytes
-    constexpr std::array<char32_t, 4> marks{0, 0xc0, 0xe0, 0xf0};
-    text.push_back(static_cast<char>(marks[static_cast<std::size_t>(further)] | character >> 6 * further));
-    for (int i = further - 1; i >= 0; --i)
-        text.push_back(static_cast<char>(0x80 | (character >> 6 * i & 0x3f)));
-}
-
 } // namespace
 
 TextSearch::TextSearch(const std::set<std::string>& texts, const Spellings& spellings) : texts_(texts) {
@@ -127,8 +107,8 @@ TextSearch::TextSearch(const std::set<std::string>& texts, const Spellings& spel
         if (!isLong(characters))
             continue;
         addNeedle(text);
-        addNeedle(bytesOf(utf16(characters), true));
-        addNeedle(bytesOf(utf16(characters), false));
+        addNeedle(utf16(characters, true));
+        addNeedle(utf16(characters, false));
         if (const auto bytes = latin1(characters); bytes && *bytes != text)
             addNeedle(*bytes);
     }
@@ -202,7 +182,7 @@ std::string textFromUTF16(std::string_view bytes) {
     for (std::size_t at = isMarked ? 2 : 0; at + 1 < bytes.size(); at += 2) {
         const char32_t unit = unitAt(at);
         const bool isPair = unit >= 0xd800 && unit < 0xdc00 && at + 3 < bytes.size();
-        appendUTF8(isPair ? 0x10000 + ((unit & 0x3ff) << 10) + (unitAt(at + 2) & 0x3ff) : unit, text);
+        text += encodedUTF8(isPair ? 0x10000 + ((unit & 0x3ff) << 10) + (unitAt(at + 2) & 0x3ff) : unit);
         at += isPair ? 2 : 0;
     }
     return text;

@@ -4,12 +4,7 @@
 
 #include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
-#include <cstdint>
-#include <set>
 #include <sstream>
-#include <string>
-#include <utility>
-#include <vector>
 
 namespace ZULMetaData::detail {
 

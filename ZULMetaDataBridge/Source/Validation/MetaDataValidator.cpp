@@ -1,11 +1,11 @@
 #include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
+#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/MovieDuration.h"
 #include "ZULMetaDataBridge/Source/Validation/ContainerWalk.h"
 
 #include <algorithm>
-#include <array>
 #include <stdexcept>
 
 namespace ZULMetaData {
@@ -27,7 +27,8 @@ bool ValidationReport::hidesStreams() const {
     constexpr std::array codes{FindingCode::TrailingBytes, FindingCode::ZeroSizeChild, FindingCode::BeyondParent,
                                FindingCode::BeyondFile,    FindingCode::DroppedTail,   FindingCode::OpenEndedAtom};
     const auto isInMetaData = [&](const Finding& finding) {
-        return (finding.place == "ZULM" || finding.place == "DATA" || finding.code == FindingCode::ZeroSizeChild) &&
+        return (finding.place == detail::s_metaDataAtom.text() || finding.place == detail::s_streamAtom.text() ||
+                finding.code == FindingCode::ZeroSizeChild) &&
                std::find(codes.begin(), codes.end(), finding.code) != codes.end();
     };
     return std::any_of(findings.begin(), findings.end(), isInMetaData) ||
@@ -48,13 +49,7 @@ ValidationReport validateRecording(const ByteSource& file, Container::Type type,
     report.container = type;
     report.bytes = file.size();
     report.duration = movieDuration(file, type);
-    detail::ContainerWalk walk(file, report, ignored);
-    switch (type) {
-    case Container::QuickTime: walk.walkMovie(); break;
-    case Container::Riff: walk.walkRIFF(); break;
-    case Container::RawStream: walk.walkRawStream(); break;
-    default: throw std::runtime_error(RecognizedContainer().refusal());
-    }
+    detail::walkContainer(file, report, ignored);
     return report;
 }
 
