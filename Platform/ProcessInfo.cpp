@@ -110,10 +110,7 @@ ProcessInfo ProcessInfo::current() {
     info.processorCount = std::max(configuredProcessors(), info.activeProcessorCount);
     info.physicalMemory = memorySize();
     info.operatingSystemVersionString = versionText();
-    const auto numbers = parseReleaseNumbers(release());
-    info.operatingSystemVersion.major = numbers.major;
-    info.operatingSystemVersion.minor = numbers.minor;
-    info.operatingSystemVersion.patch = numbers.patch;
+    info.operatingSystemVersion = parseReleaseNumbers(release());
     return info;
 }
 

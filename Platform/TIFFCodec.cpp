@@ -1,6 +1,4 @@
-#include "Platform/TIFFCodec.h"
-
-#include "Platform/ImageLimits.h"
+#include "Platform/ImageCodecs.h"
 
 #include <tiffio.h>
 
