@@ -6,7 +6,6 @@
 #include <cstdio>
 #include <fcntl.h>
 #include <span>
-#include <string>
 #include <system_error>
 #include <vector>
 

@@ -1,7 +1,5 @@
 #include "ZULMetaData/StreamEntries.h"
 
-#include <algorithm>
-#include <cstring>
 #include <new>
 #include <streambuf>
 #include <utility>
