@@ -1,10 +1,13 @@
 #pragma once
 
-// What the code around system calls shares: a file descriptor that is closed when its scope ends, calls that signals do
-// not cut short, and words for messages.
+// What the code around system calls shares: a file descriptor that is closed when its scope ends, and calls that
+// signals do not cut short. Every failure is a `std::system_error` that says what could not be done, but not to which
+// file.
 
 #include <cerrno>
+#include <cstddef>
 #include <cstdint>
+#include <span>
 #include <string>
 #include <unistd.h>
 
@@ -18,6 +21,8 @@ auto uninterrupted(Call call) {
         result = call();
     return result;
 }
+
+[[noreturn]] void throwSystemError(int error, const std::string& what);
 
 /// The end of a message about a place in a file.
 inline std::string atOffset(std::uint64_t position) {
@@ -36,6 +41,15 @@ public:
 
     int number() const { return number_; }
     bool isOpen() const { return number_ >= 0; }
+
+    /// Reads bytes and returns their number, which is smaller than asked for only at the end of the file.
+    std::size_t readAt(std::uint64_t position, std::span<char> bytes) const;
+
+    /// Writes all of `bytes`, or throws with some of them written.
+    void writeAt(std::uint64_t position, std::span<const char> bytes);
+
+    /// Cuts the file off, or fills it up with zeros.
+    void truncate(std::uint64_t size);
 
 private:
     int number_;

@@ -4,10 +4,8 @@
 
 #include <algorithm>
 #include <cstdio>
-#include <cstring>
 #include <fcntl.h>
-#include <limits>
-#include <string>
+#include <span>
 #include <system_error>
 #include <vector>
 
@@ -17,13 +15,28 @@ namespace {
 
 using Side = CopyError::Side;
 
+constexpr const char* s_cannotRename = "cannot be put in place";
 constexpr std::uint64_t s_bufferSize = 1 << 20; // in bytes
 
 /// What the system copies between two reports of progress, in bytes.
 [[maybe_unused]] constexpr std::uint64_t s_systemCopy = 64 << 20;
 
-[[noreturn]] void fail(Side side, int error, const std::string& what) {
-    throw CopyError(side, what + ": " + std::strerror(error));
+/// Says which file failed if `call` fails.
+template <class Call>
+auto on(Side side, Call call) {
+    try {
+        return call();
+    } catch (const std::system_error& error) {
+        throw CopyError(side, error.what());
+    }
+}
+
+/// Throws if there is no such file.
+int descriptorOf(const FileLocation& file, int flags) {
+    const int descriptor = uninterrupted([&] { return open(file.c_str(), flags | O_CLOEXEC); });
+    if (descriptor < 0)
+        throwSystemError(errno, "cannot be opened");
+    return descriptor;
 }
 
 /// One copy of a range. The target begins where the range does.
@@ -31,14 +44,9 @@ class RangeCopy {
 public:
     RangeCopy(const FileLocation& source, std::uint64_t offset, std::uint64_t size, const FileLocation& target,
               const CopyProgress& progress)
-        : source_(uninterrupted([&] { return open(source.c_str(), O_RDONLY | O_CLOEXEC); })),
-          target_(uninterrupted([&] { return open(target.c_str(), O_WRONLY | O_CLOEXEC); })), offset_(offset),
-          end_(offset + size), progress_(progress) {
-        if (!source_.isOpen())
-            fail(Side::Source, errno, "cannot be opened");
-        if (!target_.isOpen())
-            fail(Side::Target, errno, "cannot be opened");
-    }
+        : source_(on(Side::Source, [&] { return descriptorOf(source, O_RDONLY); })),
+          target_(on(Side::Target, [&] { return descriptorOf(target, O_WRONLY); })), offset_(offset),
+          end_(offset + size), progress_(progress) {}
 
     void run() {
         setTargetSize(0);
@@ -110,31 +118,16 @@ private:
     std::uint64_t copyByHand(std::uint64_t position, std::uint64_t size) {
         buffer_.resize(s_bufferSize);
         const auto wanted = static_cast<std::size_t>(std::min<std::uint64_t>(size, buffer_.size()));
-        const ssize_t got = uninterrupted(
-            [&] { return pread(source_.number(), buffer_.data(), wanted, static_cast<off_t>(position)); });
-        if (got < 0)
-            fail(Side::Source, errno, "cannot be read" + atOffset(position));
+        const std::span<char> bytes(buffer_.data(), wanted);
+        const std::size_t got = on(Side::Source, [&] { return source_.readAt(position, bytes); });
         if (got == 0)
             throw CopyError(Side::Source, "ends" + atOffset(position));
-        write(position - offset_, static_cast<std::size_t>(got));
-        return static_cast<std::uint64_t>(got);
-    }
-
-    void write(std::uint64_t position, std::size_t size) {
-        for (std::size_t done = 0; done < size;) {
-            const ssize_t put = uninterrupted([&] {
-                return pwrite(target_.number(), buffer_.data() + done, size - done,
-                              static_cast<off_t>(position + done));
-            });
-            if (put <= 0)
-                fail(Side::Target, put < 0 ? errno : EIO, "cannot be written" + atOffset(position + done));
-            done += static_cast<std::size_t>(put);
-        }
+        on(Side::Target, [&] { target_.writeAt(position - offset_, bytes.first(got)); });
+        return got;
     }
 
     void setTargetSize(std::uint64_t size) {
-        if (uninterrupted([&] { return ftruncate(target_.number(), static_cast<off_t>(size)); }) != 0)
-            fail(Side::Target, errno, "cannot be given a length of " + std::to_string(size) + " bytes");
+        on(Side::Target, [&] { target_.truncate(size); });
     }
 
     void report(std::uint64_t position) const {
@@ -163,10 +156,6 @@ int renameIntoFreeName([[maybe_unused]] const FileLocation& from, [[maybe_unused
 #endif
 }
 
-[[noreturn]] void failToRename(int error) {
-    throw std::system_error(error, std::generic_category(), "cannot be put in place");
-}
-
 } // namespace
 
 void copyFileRange(const FileLocation& source, std::uint64_t offset, std::uint64_t size, const FileLocation& target,
@@ -178,7 +167,7 @@ void renameWithoutReplacing(const FileLocation& from, const FileLocation& to) {
     if (renameIntoFreeName(from, to) == 0)
         return;
     if (errno != EINVAL && errno != ENOSYS && errno != ENOTSUP)
-        failToRename(errno);
+        throwSystemError(errno, s_cannotRename);
     renameOverPlaceholder(from, to);
 }
 
@@ -186,12 +175,12 @@ void renameOverPlaceholder(const FileLocation& from, const FileLocation& to) {
     const Descriptor placeholder(
         uninterrupted([&] { return open(to.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600); }));
     if (!placeholder.isOpen())
-        failToRename(errno);
+        throwSystemError(errno, s_cannotRename);
     if (std::rename(from.c_str(), to.c_str()) == 0)
         return;
     const int reason = errno;
     unlink(to.c_str());
-    failToRename(reason);
+    throwSystemError(reason, s_cannotRename);
 }
 
 } // namespace ZULMetaData

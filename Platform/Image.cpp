@@ -1,8 +1,6 @@
 #include "Platform/Image.h"
 
-#include "Platform/ImageLimits.h"
-#include "Platform/PNGCodec.h"
-#include "Platform/TIFFCodec.h"
+#include "Platform/ImageCodecs.h"
 
 #include <algorithm>
 

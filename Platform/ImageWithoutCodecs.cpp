@@ -3,7 +3,7 @@
 
 #include "Platform/Image.h"
 
-#include "Platform/ImageLimits.h"
+#include "Platform/ImageCodecs.h"
 
 namespace ZULMetaData {
 

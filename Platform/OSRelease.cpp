@@ -2,6 +2,7 @@
 
 #include <charconv>
 #include <optional>
+#include <sstream>
 #include <system_error>
 
 namespace ZULMetaData {
@@ -19,12 +20,6 @@ std::string_view trimmed(std::string_view text) {
     if (first == std::string_view::npos)
         return {};
     return text.substr(first, text.find_last_not_of(s_blanks) - first + 1);
-}
-
-std::string_view takeLine(std::string_view& text) {
-    const auto line = text.substr(0, text.find('\n'));
-    text.remove_prefix(line.size() < text.size() ? line.size() + 1 : line.size());
-    return line;
 }
 
 bool isEscapable(char next, char quote) {
@@ -70,8 +65,9 @@ ReleaseNumbers parseReleaseNumbers(std::string_view release) noexcept {
 std::string prettyNameOfOSRelease(std::string_view text) {
     constexpr std::string_view key = "PRETTY_NAME=";
     std::string name;
-    while (!text.empty()) {
-        const auto line = trimmed(takeLine(text));
+    std::string wholeLine;
+    for (std::istringstream lines{std::string(text)}; std::getline(lines, wholeLine);) {
+        const auto line = trimmed(wholeLine);
         if (line.starts_with(key))
             name = unquoted(line.substr(key.size())).value_or(std::string());
     }

@@ -2,17 +2,14 @@
 
 // The texts in which an operating system states its name and release, taken apart.
 
-#include <cstdint>
+#include "Platform/ProcessInfo.h"
+
 #include <string>
 #include <string_view>
 
 namespace ZULMetaData {
 
-struct ReleaseNumbers {
-    std::int64_t major = 0;
-    std::int64_t minor = 0;
-    std::int64_t patch = 0;
-};
+using ReleaseNumbers = decltype(ProcessInfo::operatingSystemVersion);
 
 /// The leading numbers of a release like "6.1.0-13-amd64" or "14.2". A part that is missing, or too large for its
 /// field, is 0, and so are the parts after it.

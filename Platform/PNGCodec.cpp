@@ -1,6 +1,4 @@
-#include "Platform/PNGCodec.h"
-
-#include "Platform/ImageLimits.h"
+#include "Platform/ImageCodecs.h"
 
 #include <png.h>
 

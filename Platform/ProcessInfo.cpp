@@ -35,24 +35,16 @@ std::string systemText(const char* name) {
     return sysctlbyname(name, text, &size, nullptr, 0) == 0 ? std::string(text) : std::string();
 }
 
-std::uint64_t configuredProcessors() {
-    return systemNumber<std::int32_t>("hw.logicalcpu_max");
-}
-
-std::uint64_t onlineProcessors() {
-    return systemNumber<std::int32_t>("hw.activecpu");
-}
-
-std::uint64_t memorySize() {
-    return systemNumber<std::int64_t>("hw.memsize");
-}
-
-std::string release() {
-    return systemText("kern.osproductversion");
-}
-
-std::string versionText() {
-    return "Version " + release() + " (Build " + systemText("kern.osversion") + ")";
+/// Returns what the system says. A number that it does not say is 0.
+ProcessInfo factsOfSystem() {
+    const std::string release = systemText("kern.osproductversion");
+    ProcessInfo info;
+    info.processorCount = systemNumber<std::int32_t>("hw.logicalcpu_max");
+    info.activeProcessorCount = systemNumber<std::int32_t>("hw.activecpu");
+    info.physicalMemory = systemNumber<std::int64_t>("hw.memsize");
+    info.operatingSystemVersionString = "Version " + release + " (Build " + systemText("kern.osversion") + ")";
+    info.operatingSystemVersion = parseReleaseNumbers(release);
+    return info;
 }
 
 #else
@@ -62,29 +54,6 @@ std::uint64_t systemNumber(int name) {
     return value > 0 ? static_cast<std::uint64_t>(value) : 0;
 }
 
-std::uint64_t configuredProcessors() {
-    return systemNumber(_SC_NPROCESSORS_CONF);
-}
-
-std::uint64_t onlineProcessors() {
-    return systemNumber(_SC_NPROCESSORS_ONLN);
-}
-
-std::uint64_t memorySize() {
-    return systemNumber(_SC_PHYS_PAGES) * systemNumber(_SC_PAGESIZE);
-}
-
-utsname kernelName() {
-    utsname name{};
-    if (uname(&name) != 0)
-        return {};
-    return name;
-}
-
-std::string release() {
-    return kernelName().release;
-}
-
 std::string contentsOf(const char* path) {
     std::ifstream file(path, std::ios::binary);
     std::ostringstream contents;
@@ -92,12 +61,27 @@ std::string contentsOf(const char* path) {
     return contents.str();
 }
 
-std::string versionText() {
+std::string nameOfDistribution() {
     for (const char* path : {"/etc/os-release", "/usr/lib/os-release"})
         if (auto name = prettyNameOfOSRelease(contentsOf(path)); !name.empty())
             return name;
-    const utsname kernel = kernelName();
-    return std::string(kernel.sysname) + " " + kernel.release;
+    return {};
+}
+
+/// Returns what the system says. A number that it does not say is 0.
+ProcessInfo factsOfSystem() {
+    utsname kernel{};
+    if (uname(&kernel) != 0)
+        kernel = {};
+    ProcessInfo info;
+    info.processorCount = systemNumber(_SC_NPROCESSORS_CONF);
+    info.activeProcessorCount = systemNumber(_SC_NPROCESSORS_ONLN);
+    info.physicalMemory = systemNumber(_SC_PHYS_PAGES) * systemNumber(_SC_PAGESIZE);
+    info.operatingSystemVersionString = nameOfDistribution();
+    if (info.operatingSystemVersionString.empty())
+        info.operatingSystemVersionString = std::string(kernel.sysname) + " " + kernel.release;
+    info.operatingSystemVersion = parseReleaseNumbers(kernel.release);
+    return info;
 }
 
 #endif
@@ -105,15 +89,9 @@ std::string versionText() {
 } // namespace
 
 ProcessInfo ProcessInfo::current() {
-    ProcessInfo info;
-    info.activeProcessorCount = std::max<std::uint64_t>(onlineProcessors(), 1);
-    info.processorCount = std::max(configuredProcessors(), info.activeProcessorCount);
-    info.physicalMemory = memorySize();
-    info.operatingSystemVersionString = versionText();
-    const auto numbers = parseReleaseNumbers(release());
-    info.operatingSystemVersion.major = numbers.major;
-    info.operatingSystemVersion.minor = numbers.minor;
-    info.operatingSystemVersion.patch = numbers.patch;
+    ProcessInfo info = factsOfSystem();
+    info.activeProcessorCount = std::max<std::uint64_t>(info.activeProcessorCount, 1);
+    info.processorCount = std::max(info.processorCount, info.activeProcessorCount);
     return info;
 }
 

@@ -1,11 +1,10 @@
-#include "Platform/TIFFCodec.h"
-
-#include "Platform/ImageLimits.h"
+#include "Platform/ImageCodecs.h"
 
 #include <tiffio.h>
 
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <cstdarg>
 #include <cstdio>
 #include <cstring>
@@ -264,17 +263,12 @@ bool markAlphaAsPremultiplied(TIFF* tiff) {
 /// libtiff knows how to mirror but not how to turn by a quarter. A turned picture is mirrored so that its transpose is
 /// upright. Returns whether it has to be transposed.
 bool mirrorInsteadOfTurning(TIFF* tiff) {
-    constexpr std::array<std::pair<std::uint16_t, std::uint16_t>, 4> mirrors{
-        {{ORIENTATION_LEFTTOP, ORIENTATION_TOPLEFT},
-         {ORIENTATION_RIGHTTOP, ORIENTATION_BOTLEFT},
-         {ORIENTATION_RIGHTBOT, ORIENTATION_BOTRIGHT},
-         {ORIENTATION_LEFTBOT, ORIENTATION_TOPRIGHT}}};
-    const auto orientation = field<std::uint16_t>(tiff, TIFFTAG_ORIENTATION);
-    const auto mirror = std::find_if(mirrors.begin(), mirrors.end(),
-                                     [orientation](const auto& known) { return known.first == orientation; });
-    if (mirror == mirrors.end())
+    constexpr std::array<int, 4> mirrors{ORIENTATION_TOPLEFT, ORIENTATION_BOTLEFT, ORIENTATION_BOTRIGHT,
+                                         ORIENTATION_TOPRIGHT}; // instead of LEFTTOP, RIGHTTOP, RIGHTBOT and LEFTBOT
+    const auto turned = std::size_t{field<std::uint16_t>(tiff, TIFFTAG_ORIENTATION)} - ORIENTATION_LEFTTOP;
+    if (turned >= mirrors.size())
         return false;
-    TIFFSetField(tiff, TIFFTAG_ORIENTATION, mirror->second);
+    TIFFSetField(tiff, TIFFTAG_ORIENTATION, mirrors[turned]);
     return true;
 }
 
@@ -295,8 +289,9 @@ bool isReadInFull(const TIFFRGBAImage& image, TIFF* tiff) {
     }
 }
 
-/// Fills `rgba` with one pixel per 32-bit word, red in the lowest byte.
-bool readWords(TIFF* tiff, std::uint32_t width, std::uint32_t height, std::vector<std::uint8_t>& rgba) {
+/// Fills `rgba` with one pixel per 32-bit word, red in the lowest byte. Such words are the bytes that are wanted.
+static_assert(std::endian::native == std::endian::little);
+bool readPixels(TIFF* tiff, std::uint32_t width, std::uint32_t height, std::vector<std::uint8_t>& rgba) {
     TIFFRGBAImage image{};
     char reason[1024] = {};
     constexpr int stopOnError = 1;
@@ -307,17 +302,6 @@ bool readWords(TIFF* tiff, std::uint32_t width, std::uint32_t height, std::vecto
                       TIFFRGBAImageGet(&image, reinterpret_cast<std::uint32_t*>(rgba.data()), width, height) == 1;
     TIFFRGBAImageEnd(&image);
     return read;
-}
-
-void wordsToBytes(std::vector<std::uint8_t>& rgba) {
-    for (std::size_t i = 0; i < rgba.size(); i += 4) {
-        std::uint32_t word = 0;
-        std::memcpy(&word, &rgba[i], sizeof word);
-        rgba[i] = static_cast<std::uint8_t>(TIFFGetR(word));
-        rgba[i + 1] = static_cast<std::uint8_t>(TIFFGetG(word));
-        rgba[i + 2] = static_cast<std::uint8_t>(TIFFGetB(word));
-        rgba[i + 3] = static_cast<std::uint8_t>(TIFFGetA(word));
-    }
 }
 
 void undoPremultiplication(std::vector<std::uint8_t>& rgba) {
@@ -412,10 +396,9 @@ std::optional<Image> decodeTIFF(std::span<const std::uint8_t> encoded) {
     std::vector<std::uint8_t> rgba(rgbaSize(width, height));
     // A directory may hold tags that libtiff only warns about. A warning about the pixels means that some are lost.
     picture.troubles.warning = false;
-    const bool read = readWords(tiff, width, height, rgba);
+    const bool read = readPixels(tiff, width, height, rgba);
     if (!read || picture.troubles.error || picture.troubles.warning || picture.input.cutShort)
         return std::nullopt;
-    wordsToBytes(rgba);
     if (premultiplied)
         undoPremultiplication(rgba);
     return sideways ? transposed(width, height, rgba) : Image(width, height, std::move(rgba));

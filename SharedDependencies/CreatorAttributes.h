@@ -5,7 +5,6 @@
 #include "Export.h"
 
 #include <array>
-#include <cstddef>
 #include <string>
 #include <type_traits>
 

@@ -2,7 +2,6 @@
 
 #include <cerrno>
 #include <filesystem>
-#include <istream>
 #include <ostream>
 #include <system_error>
 

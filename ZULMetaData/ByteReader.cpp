@@ -1,6 +1,7 @@
 #include "ZULMetaData/ByteReader.h"
 
 #include <algorithm>
+#include <limits>
 
 namespace ZULMetaData::detail {
 
@@ -24,8 +25,9 @@ std::string_view ByteReader::refilled(std::uint64_t position, std::uint64_t size
         if (window_.capacity() > 2 * s_largestBlock && count <= s_largestBlock)
             window_ = {}; // a single large piece does not keep its memory
         window_.resize(count);
-        windowStart_ = position;
+        windowStart_ = std::numeric_limits<std::uint64_t>::max(); // the window stays empty if reading fails
         window_.resize(source_.read(position, window_));
+        windowStart_ = position;
     }
     const auto start = static_cast<std::size_t>(position - windowStart_);
     return {window_.data() + start, std::min(static_cast<std::size_t>(wanted), window_.size() - start)};

@@ -39,6 +39,12 @@ public:
         return refilled(position, size);
     }
 
+    /// Returns all bytes from `position` on that are in memory: at least one, except at the end.
+    std::string_view from(std::uint64_t position) {
+        const std::string_view first = at(position, 1);
+        return first.empty() ? first : std::string_view(first.data(), window_.data() + window_.size());
+    }
+
     /// Returns the number that is stored at `position` as this processor stores it. Empty if its bytes do not exist.
     template <class Number>
     std::optional<Number> numberAt(std::uint64_t position) {

@@ -1,13 +1,11 @@
 #pragma once
 
 #include "../SharedDependencies/Export.h"
-#include "ByteSource.h"
+#include "ByteReader.h"
 
-#include <cstddef>
 #include <cstdint>
 #include <istream>
 #include <streambuf>
-#include <vector>
 
 namespace ZULMetaData {
 
@@ -24,12 +22,8 @@ protected:
     std::streambuf::pos_type seekpos(std::streambuf::pos_type position, std::ios_base::openmode which) override;
 
 private:
-    std::uint64_t position() const { return blockEnd_ - static_cast<std::uint64_t>(egptr() - gptr()); }
-
-    ByteSource source_;
-    std::vector<char> block_;
-    std::size_t blockSize_ = 0;
-    std::uint64_t blockEnd_ = 0; ///< the position in the source after the bytes of the block
+    detail::ByteReader reader_;
+    std::uint64_t blockEnd_ = 0; ///< the position in the source after the bytes of the get area
 };
 
 } // namespace ZULMetaData

@@ -1,7 +1,5 @@
 #include "ZULMetaData/StreamEntries.h"
 
-#include <algorithm>
-#include <cstring>
 #include <new>
 #include <streambuf>
 #include <utility>
@@ -39,28 +37,17 @@ std::optional<StreamEntry> StreamEntries::next() {
     end_ = StreamExtent::AtEntry;
     if (!header_ || position_ == reader_.size())
         return std::nullopt;
-    const std::optional<std::uint64_t> size = sizeOfNext();
-    if (!size)
-        return std::nullopt;
-    const StreamEntry entry{position_, *size};
-    position_ = entry.end();
-    return entry;
-}
-
-std::optional<std::uint64_t> StreamEntries::sizeOfNext() {
     std::optional<std::uint64_t> size = header_->fixedEntrySize;
     if (*size == 0) {
         const auto following = reader_.numberAt<Size>(position_);
-        if (following == Size{0}) {
-            end_ = StreamExtent::EmptyEntry;
-            return std::nullopt;
-        }
         size = following ? std::optional(sizeof(Size) + std::uint64_t{*following}) : std::nullopt;
+        end_ = following == Size{0} ? StreamExtent::EmptyEntry : StreamExtent::AtEntry;
     }
-    if (size && *size <= reader_.size() - position_)
-        return size;
-    end_ = StreamExtent::InsideEntry;
-    return std::nullopt;
+    if (!size || *size > reader_.size() - position_)
+        end_ = StreamExtent::InsideEntry;
+    if (end_ != StreamExtent::AtEntry)
+        return std::nullopt;
+    return StreamEntry{std::exchange(position_, position_ + *size), *size};
 }
 
 std::optional<StreamExtent> measureStream(const ByteSource& stream) {
@@ -84,7 +71,7 @@ std::optional<StreamExtent> measureStream(const ByteSource& stream) {
 
 namespace detail {
 
-bool readEntryBytes(std::string_view bytes, double& time, std::string& text) {
+bool readEntryBytes(std::string_view bytes, double& time, std::string& text, int) {
     if (!isText(bytes))
         return false;
     BytesInput input(bytes);
@@ -92,7 +79,7 @@ bool readEntryBytes(std::string_view bytes, double& time, std::string& text) {
     return true;
 }
 
-bool readEntryBytes(std::string_view bytes, double& time, std::list<std::string>& texts) {
+bool readEntryBytes(std::string_view bytes, double& time, std::list<std::string>& texts, int) {
     constexpr std::size_t start = 2 * sizeof(Size);
     if (bytes.size() < start || detail::numberIn<Size>(bytes, 0) != bytes.size() - sizeof(Size))
         return false;

@@ -68,8 +68,6 @@ public:
     detail::ByteReader& reader() { return reader_; } ///< is for the library itself
 
 private:
-    std::optional<std::uint64_t> sizeOfNext();
-
     detail::ByteReader reader_;
     std::optional<MetaDataHeader> header_;
     std::uint64_t position_ = 0;
@@ -97,8 +95,8 @@ std::optional<TimedValue<T>> decodeEntry(std::string_view bytes, int version);
 
 namespace detail {
 
-ZULMETADATA_API bool readEntryBytes(std::string_view bytes, double& time, std::string& text);
-ZULMETADATA_API bool readEntryBytes(std::string_view bytes, double& time, std::list<std::string>& texts);
+ZULMETADATA_API bool readEntryBytes(std::string_view bytes, double& time, std::string& text, int version);
+ZULMETADATA_API bool readEntryBytes(std::string_view bytes, double& time, std::list<std::string>& texts, int version);
 ZULMETADATA_API bool readEntryBytes(std::string_view bytes, double& time, CursorImage& image, int version);
 
 } // namespace detail
@@ -113,10 +111,8 @@ std::optional<TimedValue<T>> decodeEntry(std::string_view bytes, [[maybe_unused]
             std::memcpy(&decoded.time, bytes.data(), sizeof decoded.time);
             std::memcpy(&decoded.value, bytes.data() + sizeof decoded.time, sizeof decoded.value);
         }
-    } else if constexpr (std::same_as<T, CursorImage>) {
-        fits = detail::readEntryBytes(bytes, decoded.time, decoded.value, version);
     } else {
-        fits = detail::readEntryBytes(bytes, decoded.time, decoded.value);
+        fits = detail::readEntryBytes(bytes, decoded.time, decoded.value, version);
     }
     if (!fits)
         return std::nullopt;

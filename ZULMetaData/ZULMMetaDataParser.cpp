@@ -1,12 +1,17 @@
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include "ZULMetaData/Containers/AtomFormat.h"
+#include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/ContainerScan.h"
-#include "ZULMetaData/Containers/FileParser.h"
+#include "ZULMetaData/FileInputBuffer.h"
 #include "ZULMetaData/PositionedInput.h"
 
 #include <algorithm>
+#include <cerrno>
+#include <fstream>
 #include <iostream>
+#include <stdexcept>
+#include <system_error>
 #include <utility>
 
 namespace ZULMetaData {
@@ -22,6 +27,67 @@ std::string extensionOf(const std::string& path) {
     return extension;
 }
 
+/// A file that is read through a buffer of its own.
+struct InputFile {
+    explicit InputFile(const std::string& path) : buffer(*stream.rdbuf()) {
+        static_cast<std::istream&>(stream).rdbuf(&buffer); // only as such can it be given another buffer
+        fileOpen(stream, path.c_str(), std::ios_base::in | std::ios_base::binary);
+    }
+
+    std::ifstream stream;
+    detail::FileInputBuffer buffer;
+};
+
+/// Reads a file of its own or a stream of the caller. Finds nothing before it scans.
+class Parser final : public MetaDataParser {
+public:
+    Parser(const std::string& path, StreamType type)
+        : file_(std::make_unique<InputFile>(path)), stream_(file_->stream), type_(type) {}
+    Parser(std::istream& stream, StreamType type) : stream_(stream), type_(type) {}
+
+    bool isOpen() const { return file_->stream.is_open(); }
+    void setStreamType(StreamType type) { type_ = type; }
+
+    StreamType getStreamType() const override { return type_; }
+    std::istream& getStream() override { return stream_; }
+    void close() override {
+        if (!file_)
+            return;
+        file_->stream.close();
+        file_->buffer.forget();
+    }
+
+    /// Finds what the plain scan does, and what follows a RIFF chunk whose size is not in its header.
+    void scanThoroughly() {
+        const ByteSource file = ByteSource::stream(stream_);
+        rewind();
+        cacheFileStreamInfo();
+        requireReadable(stream_);
+        if (type_ != Riff)
+            return;
+        ItemWalk chunks(file, Riff);
+        const auto first = chunks.next();
+        if (!first || first->sizeSource == ContainerItem::Header || chunks.position() >= file.size())
+            return;
+        rewind();
+        detail::StreamCache found;
+        detail::scanChunks(stream_, file.size(), found, chunks.position());
+        requireReadable(stream_);
+        for (const auto& [type, place] : found)
+            cacheStream(type, place);
+    }
+
+private:
+    void rewind() {
+        stream_.clear();
+        stream_.seekg(0);
+    }
+
+    std::unique_ptr<InputFile> file_; ///< null if the stream is the caller's
+    std::istream& stream_;
+    StreamType type_;
+};
+
 } // namespace
 
 MetaDataParser::StreamType MetaDataParser::streamTypeOf(const std::string& path) {
@@ -34,7 +100,7 @@ MetaDataParser::StreamType MetaDataParser::streamTypeOf(const std::string& path)
 }
 
 std::unique_ptr<MetaDataParser> MetaDataParser::create(const std::string& path) {
-    auto parser = std::make_unique<detail::FileParser>(path, streamTypeOf(path));
+    auto parser = std::make_unique<Parser>(path, streamTypeOf(path));
     if (!parser->isOpen()) {
         std::cerr << "Can't parse metadata. Unable to open file: " << path << std::endl;
         return nullptr;
@@ -47,8 +113,27 @@ std::unique_ptr<MetaDataParser> MetaDataParser::create(std::istream& stream, Str
         std::cerr << "Can't parse metadata. Stream is not good." << std::endl;
         return nullptr;
     }
-    auto parser = std::make_unique<detail::StreamParser>(stream, type);
+    auto parser = std::make_unique<Parser>(stream, type);
     return parser->cacheFileStreamInfo() ? std::move(parser) : nullptr;
+}
+
+std::unique_ptr<MetaDataParser> openContainer(const std::string& path) {
+    errno = 0;
+    auto parser = std::make_unique<Parser>(path, Container::Unknown);
+    if (!parser->isOpen())
+        throw std::system_error(errno, std::generic_category(), "cannot be opened");
+    const auto recognized = recognizeContainer(ByteSource::stream(parser->getStream()), path);
+    if (recognized.type == Container::Unknown)
+        throw std::runtime_error(recognized.refusal());
+    parser->setStreamType(recognized.type);
+    parser->scanThoroughly();
+    return parser;
+}
+
+std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, Container::Type type) {
+    auto parser = std::make_unique<Parser>(stream, type);
+    parser->scanThoroughly();
+    return parser;
 }
 
 std::vector<uuid> MetaDataParser::getAvailableMetaDataUUIDs() const {

@@ -1,6 +1,6 @@
 #include "Platform/Image.h"
 
-#include "Platform/PNGCodec.h"
+#include "Platform/ImageCodecs.h"
 #include "Tests/Platform/ImageTestSupport.h"
 
 #include <gtest/gtest.h>

@@ -65,38 +65,33 @@ bool readChunkHeader(Input& input, ContainerItem& chunk) {
     return true;
 }
 
-template <class Integer>
-std::array<char, sizeof(Integer)> bigEndianBytes(Integer value) {
-    const Integer swapped = swapInt(value);
-    std::array<char, sizeof(Integer)> bytes;
-    std::memcpy(bytes.data(), &swapped, sizeof swapped);
+/// Returns the bytes of all values, one after the other.
+template <class... Integers>
+std::array<char, (sizeof(Integers) + ...)> bigEndianBytes(Integers... values) {
+    std::array<char, (sizeof(Integers) + ...)> bytes;
+    char* place = bytes.data();
+    const auto append = [&place](auto value) {
+        value = swapInt(value);
+        std::memcpy(place, &value, sizeof value);
+        place += sizeof value;
+    };
+    (append(values), ...);
     return bytes;
 }
 
 /// Returns the header in extended form.
-inline std::array<char, s_extendedAtomHeaderSize> extendedAtomHeader(FourCC type, std::uint64_t size) {
-    const std::array<std::uint32_t, 2> sizeAndType{swapInt(s_extendedSizeMarker), swapInt(type.value)};
-    const std::uint64_t extendedSize = swapInt(size);
-    std::array<char, s_extendedAtomHeaderSize> bytes;
-    std::memcpy(bytes.data(), sizeAndType.data(), sizeof sizeAndType);
-    std::memcpy(bytes.data() + s_extendedSizeOffset, &extendedSize, sizeof extendedSize);
-    return bytes;
+inline auto extendedAtomHeader(FourCC type, std::uint64_t size) {
+    return bigEndianBytes(s_extendedSizeMarker, type.value, size);
 }
 
 /// Returns the header in its short form.
-inline std::array<char, s_atomHeaderSize> atomHeader(FourCC type, std::uint32_t size) {
-    const std::array<std::uint32_t, 2> sizeAndType{swapInt(size), swapInt(type.value)};
-    std::array<char, s_atomHeaderSize> bytes;
-    std::memcpy(bytes.data(), sizeAndType.data(), sizeof sizeAndType);
-    return bytes;
+inline auto atomHeader(FourCC type, std::uint32_t size) {
+    return bigEndianBytes(size, type.value);
 }
 
 /// Returns the header of a chunk. `size` counts the data alone.
-inline std::array<char, s_chunkHeaderSize> chunkHeader(FourCC type, std::uint32_t size) {
-    const std::array<std::uint32_t, 2> typeAndSize{swapInt(type.value), size};
-    std::array<char, s_chunkHeaderSize> bytes;
-    std::memcpy(bytes.data(), typeAndSize.data(), sizeof typeAndSize);
-    return bytes;
+inline auto chunkHeader(FourCC type, std::uint32_t size) {
+    return bigEndianBytes(type.value, swapInt(size));
 }
 
 } // namespace ZULMetaData::detail

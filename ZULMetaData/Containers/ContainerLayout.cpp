@@ -13,7 +13,7 @@ ItemWalk::ItemWalk(ByteSource file, Container::Type type)
     : reader_(std::make_shared<detail::ByteReader>(std::move(file))), type_(type),
       sizes_(detail::ExtendedSizes::BelowHeader), end_(reader_->size()) {
     if (type == Container::Riff)
-        first_ = detail::wideRIFF(*reader_);
+        first_ = detail::wideRIFF(*this);
     else if (type != Container::QuickTime)
         end_ = 0;
 }

@@ -60,22 +60,22 @@ bool isOneOf(FourCC type, const std::array<FourCC, size>& types) {
     return std::find(types.begin(), types.end(), type) != types.end();
 }
 
-/// The header at the beginning of a file. It may be cut short, except for its type and its 32-bit size.
+/// The header of the first atom. It may be cut short, except for its type and its 32-bit size; the latter is the type
+/// if the header is that of a chunk.
 struct FirstItem {
     explicit FirstItem(std::string_view bytes) : isThere(bytes.size() >= detail::s_atomHeaderSize) {
         detail::ByteReader reader(ByteSource::memory(bytes));
-        detail::ByteCursor atomCursor(reader, 0, bytes.size());
-        detail::ByteCursor chunkCursor(reader, 0, bytes.size());
-        readAtomHeader(atomCursor, detail::ExtendedSizes::Marked, atom);
-        readChunkHeader(chunkCursor, chunk);
+        detail::ByteCursor cursor(reader, 0, bytes.size());
+        readAtomHeader(cursor, detail::ExtendedSizes::Marked, atom);
     }
 
-    bool isRIFF() const { return isThere && isOneOf(chunk.type, s_riffSignatures); }
+    bool isRIFF() const { return isThere && isOneOf(FourCC(atom.sizeField), s_riffSignatures); }
     bool isAtom() const {
         return isThere && (atom.sizeField >= detail::s_atomHeaderSize || atom.sizeField == 0 ||
                            atom.sizeField == detail::s_extendedSizeMarker);
     }
     bool isKnownAtom() const { return isAtom() && isOneOf(atom.type, s_firstAtoms); }
+    bool isPrintableAtom() const { return isAtom() && isPrintable(); }
     bool fits(std::uint64_t fileSize) const {
         return isThere && atom.sizeField >= detail::s_atomHeaderSize && atom.sizeField <= fileSize;
     }
@@ -83,7 +83,6 @@ struct FirstItem {
 
     bool isThere;
     ContainerItem atom;
-    ContainerItem chunk;
 };
 
 std::string_view matroskaName(std::string_view bytes) {
@@ -96,10 +95,8 @@ std::string_view matroskaName(std::string_view bytes) {
 bool isTransportStream(std::string_view bytes) {
     constexpr std::size_t packet = 188;
     for (const std::size_t extra : {std::size_t{0}, std::size_t{4}}) {
-        bool isOne = bytes.size() > extra + 2 * (packet + extra);
-        for (std::size_t i = 0; isOne && i < 3; ++i)
-            isOne = bytes[extra + i * (packet + extra)] == 'G';
-        if (isOne)
+        const auto isSync = [&](std::size_t i) { return bytes[extra + i * (packet + extra)] == 'G'; };
+        if (bytes.size() > extra + 2 * (packet + extra) && isSync(0) && isSync(1) && isSync(2))
             return true;
     }
     return false;
@@ -115,14 +112,14 @@ std::string_view foreignNameOf(std::string_view bytes) {
     return isTransportStream(bytes) ? "an MPEG transport stream" : std::string_view();
 }
 
-/// What bytes are that nothing but this library or a movie begins with.
-Container::Type unmistakableType(std::string_view bytes) {
+/// What the bytes are, if an atom like `isMovie` begins a movie.
+Container::Type typeOf(std::string_view bytes, bool (FirstItem::*isMovie)() const) {
     if (beginsLikeStream(bytes))
         return Container::RawStream;
     const FirstItem item(bytes);
     if (item.isRIFF())
         return Container::Riff;
-    return item.isKnownAtom() ? Container::QuickTime : Container::Unknown;
+    return (item.*isMovie)() ? Container::QuickTime : Container::Unknown;
 }
 
 /// The type of a file whose first bytes say little.
@@ -135,19 +132,14 @@ Container::Type typeByName(std::string_view bytes, std::uint64_t fileSize, Conta
         return !item.isThere || item.isPrintable() || item.fits(fileSize) ? named : Container::Unknown;
     default: break;
     }
-    const bool fits = item.isAtom() && item.isPrintable() && item.atom.sizeField <= fileSize;
+    const bool fits = item.isPrintableAtom() && item.atom.sizeField <= fileSize;
     return fits ? Container::QuickTime : Container::Unknown;
 }
 
 } // namespace
 
 Container::Type streamTypeOfContents(std::string_view firstBytes) {
-    if (beginsLikeStream(firstBytes))
-        return Container::RawStream;
-    const FirstItem item(firstBytes);
-    if (item.isRIFF())
-        return Container::Riff;
-    return item.isAtom() && item.isPrintable() ? Container::QuickTime : Container::Unknown;
+    return typeOf(firstBytes, &FirstItem::isPrintableAtom);
 }
 
 std::string_view extensionFor(Container::Type type) {
@@ -170,7 +162,7 @@ std::string RecognizedContainer::refusal() const {
 RecognizedContainer recognizeContainer(std::string_view firstBytes, std::uint64_t fileSize, const std::string& name) {
     const Container::Type named = MetaDataParser::streamTypeOf(name);
     RecognizedContainer recognized;
-    recognized.type = unmistakableType(firstBytes);
+    recognized.type = typeOf(firstBytes, &FirstItem::isKnownAtom);
     if (recognized.type == Container::Unknown)
         recognized.foreignName = foreignNameOf(firstBytes);
     if (recognized.type == Container::Unknown && recognized.foreignName.empty())

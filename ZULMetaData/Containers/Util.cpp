@@ -58,27 +58,17 @@ bool Util::finalizeAtomsInFile(const std::string& path) {
     return input.position() == total;
 }
 
-namespace {
-
-class RecordingScaleDataObserver final : public DataStreamObserver<double> {
-public:
-    bool dataRead(double, const double& value) override {
-        scale_ = value;
-        return true;
-    }
-    double scale() const { return scale_; }
-
-private:
-    double scale_ = 1.0;
-};
-
-} // namespace
-
 double Util::recordingScaleForMP4AtPath(const std::string& path) {
-    RecordingScaleDataObserver observer;
+    struct LastValue final : DataStreamObserver<double> {
+        bool dataRead(double, const double& value) override {
+            scale = value;
+            return true;
+        }
+        double scale = 1.0;
+    } observer;
     if (const auto parser = MetaDataParser::create(path))
         parser->loadDataType<double>(s_recordingScaleFactorUUID, observer, -1);
-    return observer.scale();
+    return observer.scale;
 }
 
 } // namespace ZULMetaData

@@ -3,21 +3,15 @@
 // RIFF files whose first chunk does not say in 32 bits how long it is: `RF64` and `BW64`, whose `ds64` chunk holds the
 // size in 64 bits, and files that were written to a pipe, which hold a size of 0 or 0xffffffff.
 
-#include "SharedDependencies/Export.h"
-#include "ZULMetaData/ByteReader.h"
 #include "ZULMetaData/Containers/ContainerLayout.h"
 
-#include <cstdint>
 #include <optional>
 
 namespace ZULMetaData::detail {
 
-/// How much of the end of a file is searched for metadata that follows a chunk of unknown size.
-inline constexpr std::uint64_t s_searchedTail = std::uint64_t{64} << 20;
-
 /// Returns the first chunk with its true size, which may reach beyond a file that was cut short. Returns nothing if the
 /// chunk has its size in 32 bits. In a file from a pipe the chunk ends where a `ZULM` chunk with a `DATA` chunk in it
 /// begins from which the chunks lead to the end of the file; if there is none, it ends with the file.
-ZULMETADATA_API std::optional<ContainerItem> wideRIFF(ByteReader& file);
+std::optional<ContainerItem> wideRIFF(const ItemWalk& chunks);
 
 } // namespace ZULMetaData::detail

@@ -1,11 +1,10 @@
 // RIFF files whose first chunk does not have its size in 32 bits.
 
-#include "ZULMetaData/Containers/WideRIFF.h"
+#include "ZULMetaData/Containers/ContainerLayout.h"
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
 #include "Tests/ZULMetaData/Containers/ContainerBytes.h"
-#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 
 #include <gtest/gtest.h>
@@ -35,8 +34,8 @@ std::string piped(std::uint32_t size, const std::string& samples) {
 }
 
 std::optional<ContainerItem> widthOf(const std::string& file) {
-    detail::ByteReader reader(ByteSource::memory(file));
-    return detail::wideRIFF(reader);
+    const auto first = ItemWalk(ByteSource::memory(file), Container::Riff).next();
+    return first && first->sizeSource != ContainerItem::Header ? first : std::nullopt;
 }
 
 std::vector<FoundStream> foundIn(const std::string& file) {
