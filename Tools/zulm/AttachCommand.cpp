@@ -210,12 +210,6 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
                    worseOf(complainAboutLoss(movie.name(), attached.repair), complainAboutCuts(attached)));
 }
 
-ExitCode runAttach(const AttachOptions& options) {
-    std::vector<std::string> files{options.save.movie, options.save.output, options.from};
-    files.insert(files.end(), options.streams.begin(), options.streams.end());
-    return withReport("attach", options.json, files, [&](RunReport& report) { return attachStreams(options, report); });
-}
-
 } // namespace
 
 void addAttachCommand(CLI::App& app, Action& chosen) {
@@ -240,7 +234,10 @@ void addAttachCommand(CLI::App& app, Action& chosen) {
         if (options->streams.empty() && options->from.empty())
             throw CLI::RequiredError("at least one STREAM, or --from OLDMOVIE,");
         requireDestination(options->save);
-        chosen = [options] { return runAttach(*options); };
+        std::vector<std::string> files{options->save.movie, options->save.output, options->from};
+        files.insert(files.end(), options->streams.begin(), options->streams.end());
+        chosen = reporting("attach", options->json, files,
+                           [options](RunReport& report) { return attachStreams(*options, report); });
     });
 }
 

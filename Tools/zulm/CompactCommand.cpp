@@ -135,11 +135,6 @@ ExitCode writeTail(const TailOptions& options, RunReport& report) {
     }
 }
 
-ExitCode runTail(const TailOptions& options) {
-    return withReport(options.command(), options.json, {options.save.movie},
-                      [&](RunReport& report) { return writeTail(options, report); });
-}
-
 CLI::App* addTailCommand(CLI::App& app, Action& chosen, KeptMetaData kept, const std::string& description) {
     auto options = std::make_shared<TailOptions>();
     options->kept = kept;
@@ -151,7 +146,8 @@ CLI::App* addTailCommand(CLI::App& app, Action& chosen, KeptMetaData kept, const
         requireDestination(options->save);
         if (options->save.inPlace && options->save.movie == "-")
             throw CLI::ValidationError("--in-place: standard input cannot be changed; name a file, or use -o OUT");
-        chosen = [options] { return runTail(*options); };
+        chosen = reporting(options->command(), options->json, {options->save.movie},
+                           [options](RunReport& report) { return writeTail(*options, report); });
     });
     return command;
 }

@@ -363,8 +363,7 @@ ExitCode diff(const DiffOptions& options, RunReport& report) {
         return worseOf(complainAboutNothing(left, options.kinds), complainAboutNothing(right, options.kinds));
     JsonWriter* const writer = report.isWanted() ? &report.writer() : nullptr;
     if (writer) {
-        writer->beginObject();
-        writer->members(fileHeader(left.name()));
+        report.beginFile(left.name());
         writer->member("other", fileHeader(right.name()));
         writer->beginArray("streams");
     }
@@ -375,11 +374,6 @@ ExitCode diff(const DiffOptions& options, RunReport& report) {
         writer->member("same", comparison.code() == ExitFine);
     }
     return comparison.code();
-}
-
-ExitCode runDiff(const DiffOptions& options) {
-    return withReport("diff", options.json, {options.left, options.right},
-                      [&](RunReport& report) { return diff(options, report); });
 }
 
 } // namespace
@@ -404,7 +398,8 @@ void addDiffCommand(CLI::App& app, Action& chosen) {
     command->callback([options, &chosen] {
         if (options->left == "-" && options->right == "-")
             throw CLI::ValidationError("only one of A and B can be standard input");
-        chosen = [options] { return runDiff(*options); };
+        chosen = reporting("diff", options->json, {options->left, options->right},
+                           [options](RunReport& report) { return diff(*options, report); });
     });
 }
 

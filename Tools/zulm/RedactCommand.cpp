@@ -230,15 +230,13 @@ ExitCode write(const RedactOptions& options, Recording& recording, RunReport& re
     });
 }
 
-ExitCode runRedact(const RedactOptions& options) {
-    return withReport("redact", options.json, {options.file, options.output}, [&](RunReport& report) {
-        const InputFile input(options.file);
-        Recording recording = input.open();
-        if (options.dryRun)
-            return preview(options, recording, report);
-        requireOutputName(options.output, recording.container(), input.path());
-        return write(options, recording, report);
-    });
+ExitCode redact(const RedactOptions& options, RunReport& report) {
+    const InputFile input(options.file);
+    Recording recording = input.open();
+    if (options.dryRun)
+        return preview(options, recording, report);
+    requireOutputName(options.output, recording.container(), input.path());
+    return write(options, recording, report);
 }
 
 bool removesNothing(const RedactOptions& options) {
@@ -298,7 +296,8 @@ void addRedactCommand(CLI::App& app, Action& chosen) {
         if (options->output.empty() && !options->dryRun)
             throw CLI::RequiredError("--output or --dry-run");
         patternsIn(*options);
-        chosen = [options] { return runRedact(*options); };
+        chosen = reporting("redact", options->json, {options->file, options->output},
+                           [options](RunReport& report) { return redact(*options, report); });
     });
 }
 

@@ -62,11 +62,6 @@ ExitCode stampMovie(const StampOptions& options, RunReport& report) {
     return worseOf(complainAboutLoss(movie.name(), stamped.repair), complainAboutCut(options, stamped.info.creator));
 }
 
-ExitCode runStamp(const StampOptions& options) {
-    return withReport("stamp", options.json, {options.save.movie, options.save.output},
-                      [&](RunReport& report) { return stampMovie(options, report); });
-}
-
 } // namespace
 
 void addStampCommand(CLI::App& app, Action& chosen) {
@@ -90,7 +85,8 @@ void addStampCommand(CLI::App& app, Action& chosen) {
     command->footer("zulm stamp Movie.mp4 --creator Recorder --creator-version 4.2 --in-place");
     command->callback([options, &chosen] {
         requireDestination(options->save);
-        chosen = [options] { return runStamp(*options); };
+        chosen = reporting("stamp", options->json, {options->save.movie, options->save.output},
+                           [options](RunReport& report) { return stampMovie(*options, report); });
     });
 }
 

@@ -117,14 +117,6 @@ ExitCode verify(const VerifyOptions& options, const std::string& path, RunReport
     return code;
 }
 
-ExitCode runVerify(const VerifyOptions& options) {
-    if (options.listsRules)
-        return listRules();
-    return withReport("verify", options.json, options.files, [&](RunReport& report) {
-        return forEachFile(options.files, [&](const std::string& path) { return verify(options, path, report); });
-    });
-}
-
 } // namespace
 
 void addVerifyCommand(CLI::App& app, Action& chosen) {
@@ -149,7 +141,12 @@ void addVerifyCommand(CLI::App& app, Action& chosen) {
     command->callback([options, &chosen] {
         if (options->files.empty() && !options->listsRules)
             throw CLI::RequiredError("FILE");
-        chosen = [options] { return runVerify(*options); };
+        if (options->listsRules)
+            chosen = listRules;
+        else
+            chosen = reportingOnEach(
+                "verify", options->json, options->files,
+                [options](const std::string& path, RunReport& report) { return verify(*options, path, report); });
     });
 }
 
