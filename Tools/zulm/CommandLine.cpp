@@ -20,6 +20,20 @@ namespace Zulm {
 
 namespace {
 
+/// Commands that the help shows under one heading.
+struct CommandGroup {
+    const char* heading;
+    std::vector<void (*)(CLI::App& app, Action& chosen)> commands;
+};
+
+/// All commands, in the order of the help.
+const std::vector<CommandGroup> s_commandGroups{
+    {"Look", {addInfoCommand, addAtomsCommand, addDumpCommand, addDiffCommand, addGrepCommand, addViewCommand}},
+    {"Check and rescue", {addVerifyCommand, addRepairCommand, addSalvageCommand}},
+    {"Change", {addAttachCommand, addStampCommand, addRedactCommand, addCompactCommand, addDetachCommand}},
+    {"Convert", {addExtractCommand, addConvertCommand}},
+    {"Try", {addDemoCommand}}};
+
 std::vector<std::string> commandNames(const CLI::App& app) {
     std::vector<std::string> names;
     for (const CLI::App* command : app.get_subcommands([](const CLI::App*) { return true; }))
@@ -179,14 +193,14 @@ void refuseStandardOutput(CLI::App& command) {
             option->check(CLI::Validator(refused, ""));
 }
 
-void define(CLI::App& app, Action& chosen, const std::vector<CommandGroup>& groups) {
+void define(CLI::App& app, Action& chosen) {
     app.set_version_flag("--version", "zulm " ZULM_VERSION, "Print the version and end");
     app.set_help_flag("-h,--help", "Print this help and end");
     app.formatter(std::make_shared<HelpPage>());
     app.require_subcommand(0, 1);
     app.fallthrough();
     addSettings(app);
-    for (const CommandGroup& group : groups)
+    for (const CommandGroup& group : s_commandGroups)
         for (const auto addCommand : group.commands) {
             addCommand(app, chosen);
             CLI::App* command = app.get_subcommands([](CLI::App*) { return true; }).back();
@@ -202,12 +216,12 @@ void define(CLI::App& app, Action& chosen, const std::vector<CommandGroup>& grou
 
 } // namespace
 
-ExitCode runCommandLine(int argc, char** argv, const std::vector<CommandGroup>& groups) {
+ExitCode runCommandLine(int argc, char** argv) {
     CLI::App app("Looks into the metadata of screen recordings, checks and rescues it, and puts it into movies.",
                  "zulm");
     Action chosen;
     std::string format;
-    define(app, chosen, groups);
+    define(app, chosen);
     app.add_option("--generate", format)->group("");
     try {
         std::vector<std::string> words = wordsOf(argc, argv);

@@ -1,6 +1,7 @@
 // The manual as completions for the shells.
 
 #include "Tools/zulm/Manual.h"
+#include "Tools/zulm/Substitutes.h"
 
 #include <fmt/core.h>
 #include <fmt/ranges.h>
@@ -44,10 +45,7 @@ bool isFile(const ManualOption& option) {
 
 /// In single quotes of a shell.
 std::string quoted(const std::string& text) {
-    std::string escaped;
-    for (const char c : text)
-        escaped += c == '\'' ? "'\\''" : std::string(1, c);
-    return "'" + escaped + "'";
+    return "'" + substituted(text, {{'\'', "'\\''"}}) + "'";
 }
 
 /// What an option's value is completed with, as a line of bash. Names of files are left to bash itself, which knows how
@@ -76,13 +74,7 @@ std::string bashCases(const std::vector<ManualOption>& options, const std::strin
 
 /// The characters that mean something in an option given to _arguments.
 std::string zshText(const std::string& text) {
-    std::string escaped;
-    for (const char c : text) {
-        if (c == '[' || c == ']' || c == ':' || c == '\\')
-            escaped += '\\';
-        escaped += c;
-    }
-    return escaped;
+    return substituted(text, {{'[', "\\["}, {']', "\\]"}, {':', "\\:"}, {'\\', "\\\\"}});
 }
 
 std::string zshAction(const ManualOption& option) {

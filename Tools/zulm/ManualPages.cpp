@@ -1,6 +1,7 @@
 // The manual as a page for man(1) and as one for the documentation.
 
 #include "Tools/zulm/Manual.h"
+#include "Tools/zulm/Substitutes.h"
 
 #include <fmt/core.h>
 #include <fmt/ranges.h>
@@ -13,15 +14,7 @@ namespace {
 
 /// As running text of a manual page: nothing in it is a request or an escape.
 std::string roff(const std::string& text) {
-    std::string escaped;
-    for (const char c : text) {
-        if (c == '\\')
-            escaped += "\\e";
-        else if (c == '-')
-            escaped += "\\-";
-        else
-            escaped += c;
-    }
+    const std::string escaped = substituted(text, {{'\\', "\\e"}, {'-', "\\-"}});
     return escaped.starts_with(".") || escaped.starts_with("'") ? "\\&" + escaped : escaped;
 }
 
@@ -46,10 +39,7 @@ std::string roffCommand(const ManualCommand& command) {
 
 /// A '|' would divide the cell of a table.
 std::string cell(const std::string& text) {
-    std::string escaped;
-    for (const char c : text)
-        escaped += c == '|' ? "\\|" : std::string(1, c);
-    return escaped;
+    return substituted(text, {{'|', "\\|"}});
 }
 
 std::string markdownOptions(const std::vector<ManualOption>& options) {

@@ -4,6 +4,7 @@
 #include "Reports/Report.h"
 #include "Reports/Text.h"
 #include "Reports/VerifyReport.h"
+#include "Tools/zulm/Substitutes.h"
 #include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 
 #include <fmt/core.h>
@@ -49,10 +50,7 @@ std::string embeddedAddress(const Recording& recording) {
 }
 
 std::string scriptText(const Json& document) {
-    std::string text;
-    for (const char c : jsonLine(document))
-        text += c == '<' ? std::string("\\u003c") : std::string(1, c);
-    return text;
+    return substituted(jsonLine(document), {{'<', "\\u003c"}});
 }
 
 } // namespace Zulm
