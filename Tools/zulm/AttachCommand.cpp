@@ -30,7 +30,7 @@ struct AttachOptions {
     std::string from;
     TimeOptions times;
     bool replace = false;
-    bool movesIndex = false;
+    SafeMovieSave::FragmentIndex index = SafeMovieSave::FragmentIndex::Leave;
     bool unchecked = false;
     bool json = false;
 };
@@ -189,8 +189,6 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     if (retimed.sources().empty())
         return complainAboutNoStreams(options, ExitDamaged);
     const auto existing = options.replace ? ExistingStreams::Supersede : ExistingStreams::Refuse;
-    const auto index =
-        options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd : SafeMovieSave::FragmentIndex::Leave;
     const AttachPlan plan = movie.planned([&](const ByteSource& bytes, const std::string& path) {
         AttachPlan examined(streams.sources, existing);
         if (options.times.changesTimes())
@@ -198,8 +196,8 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
         examined.requireFor(bytes, path);
         return examined;
     });
-    const AttachResult attached =
-        movie.save("attaching to " + movie.name(), [&](const SafeMovieSave& save) { return save.attach(plan, index); });
+    const AttachResult attached = movie.save(
+        "attaching to " + movie.name(), [&](const SafeMovieSave& save) { return save.attach(plan, options.index); });
     const TimesOutside times{warnOfTimesOutside(movie.name(), duration, retimed.sources()), retimed.entriesRemoved()};
     if (report.isWanted())
         report.add(fileDocument(options, movie.name(), attached, times, streams));
@@ -222,7 +220,7 @@ void addAttachCommand(CLI::App& app, Action& chosen) {
                       "Attach kinds that are there already: a stream file goes before one of OLDMOVIE, and readers "
                       "take the new one before one of MOVIE, which stays in the file unread");
     addTimeOptions(*command, options->times);
-    addFragmentIndexOption(*command, options->movesIndex);
+    addFragmentIndexOption(*command, options->index);
     command->add_flag("--unchecked", options->unchecked,
                       "Attach a STREAM also if its header names no known kind and version, or if it holds bytes "
                       "but not one whole entry. What --from carries over is never refused for that");

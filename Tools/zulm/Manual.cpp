@@ -7,7 +7,6 @@
 
 #include <algorithm>
 #include <sstream>
-#include <utility>
 
 namespace Zulm {
 
@@ -68,18 +67,6 @@ const char* const s_aboutOutput =
     "files, what cannot be seen is an escape: \\xNN for a control character of ASCII and for a byte that is not "
     "UTF-8, \\u{N} for another character, two backslashes for one. JSON has the texts themselves, and the bytes "
     "of one that is not UTF-8 beside it as KEY_base64.";
-
-const std::vector<ExitCodeMeaning>& exitCodeMeanings() {
-    static const std::vector<ExitCodeMeaning> meanings{
-        {"0", "Everything is fine."},
-        {"1", "A file could not be read, or a result could not be written."},
-        {"2", "The command line is wrong. Nothing was done."},
-        {"3", "The command did its work, but found loss or damage."},
-        {"4", "The file can be read, but holds no recording metadata."},
-        {"128+n", "Signal n ended the command. Unfinished files were removed."},
-    };
-    return meanings;
-}
 
 std::vector<std::string> ManualOption::choices() const {
     std::vector<std::string> found;

@@ -91,7 +91,7 @@ std::string manPage(const Manual& manual) {
     for (const ManualOption& option : manual.options)
         page += roffOption(option);
     page += ".SH EXIT STATUS\n";
-    for (const auto& [code, meaning] : exitCodeMeanings())
+    for (const auto& [code, meaning] : s_exitCodes)
         page += fmt::format(".TP\n.B {}\n{}\n", code, roff(meaning));
     page +=
         ".SH ENVIRONMENT\n.TP\n.B NO_COLOR\nIf this is set and not empty, nothing is coloured.\n.TP\n.B TERM\nIf this "
@@ -108,7 +108,7 @@ std::string markdownPage(const Manual& manual) {
     page +=
         "\nThis page is generated from the tool's options by `zulm --generate markdown`. [schemas](schemas) has the "
         "schemas of the JSON documents.\n\n## Exit codes\n\n| code | meaning |\n| --- | --- |\n";
-    for (const auto& [code, meaning] : exitCodeMeanings())
+    for (const auto& [code, meaning] : s_exitCodes)
         page += fmt::format("| {} | {} |\n", code, meaning);
     page += "\n## Options of every command\n" + markdownOptions(manual.options);
     for (const std::string& group : groupsOf(manual))
