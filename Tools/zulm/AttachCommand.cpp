@@ -1,19 +1,16 @@
 #include "Reports/Text.h"
 #include "Tools/zulm/AttachTimes.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SaveTarget.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/MovieDuration.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
-#include <algorithm>
 #include <filesystem>
 #include <set>
 

@@ -9,7 +9,6 @@
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <iterator>
 #include <memory>
 #include <sstream>
 #include <string_view>
@@ -49,10 +48,6 @@ std::vector<std::string> optionNames(const CLI::App& app) {
     return names;
 }
 
-bool isOneOf(const std::vector<std::string>& names, const std::string& name) {
-    return std::find(names.begin(), names.end(), name) != names.end();
-}
-
 /// The command that was named, or the tool itself.
 const CLI::App& namedCommand(const CLI::App& app) {
     const auto commands = app.get_subcommands();
@@ -80,7 +75,7 @@ std::string unexpectedText(const CLI::App& app) {
         return fmt::format("{} is one argument too many", first);
     const std::string name = first.substr(0, first.find('='));
     auto names = optionNames(command);
-    if (isOneOf(names, name))
+    if (std::find(names.begin(), names.end(), name) != names.end())
         return fmt::format("{0} is an option of 'zulm {1}': it follows {1}", name, command.get_name());
     for (const std::string& global : optionNames(app))
         names.push_back(global);

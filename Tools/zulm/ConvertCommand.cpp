@@ -9,7 +9,6 @@
 
 #include <fmt/core.h>
 
-#include <algorithm>
 #include <limits>
 #include <memory>
 #include <optional>

@@ -11,7 +11,6 @@
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
-#include "Tools/zulm/StandardStreams.h"
 
 #include <fmt/core.h>
 

@@ -46,14 +46,6 @@ Json streamDocument(const StreamInfo& stream, const std::string& output) {
     return document;
 }
 
-std::vector<std::string> outputsFor(const std::vector<StreamInfo>& streams, const std::string& folder) {
-    std::vector<std::string> outputs;
-    outputs.reserve(streams.size());
-    for (const StreamInfo& stream : streams)
-        outputs.push_back(streamFileIn(folder, stream.type));
-    return outputs;
-}
-
 ExitCode extract(const ExtractOptions& options, RunReport& report) {
     const InputFile input(options.file);
     Recording recording = input.open();
@@ -61,7 +53,9 @@ ExitCode extract(const ExtractOptions& options, RunReport& report) {
     if (streams.empty())
         return complainAboutNothing(recording, options.kinds);
     createFolder(options.folder);
-    const std::vector<std::string> outputs = outputsFor(streams, options.folder);
+    std::vector<std::string> outputs;
+    for (const StreamInfo& stream : streams)
+        outputs.push_back(streamFileIn(options.folder, stream.type));
     requireFree(outputs, options.force);
     if (report.isWanted())
         report.beginFile(input.name()).beginArray("streams");

@@ -14,7 +14,6 @@
 #include <memory>
 #include <optional>
 #include <system_error>
-#include <utility>
 
 namespace Zulm {
 

@@ -1,9 +1,8 @@
 #include "Tools/zulm/Manual.h"
 
+#include "Tools/zulm/Choice.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
 #include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
-
-#include <fmt/core.h>
 
 #include <algorithm>
 #include <sstream>
@@ -69,13 +68,11 @@ const char* const s_aboutOutput =
     "of one that is not UTF-8 beside it as KEY_base64.";
 
 std::vector<std::string> ManualOption::choices() const {
-    std::vector<std::string> found;
     if (value == "KIND")
-        for (const ZULMetaData::MetaDataKind& kind : ZULMetaData::s_metaDataKinds)
-            found.emplace_back(kind.name);
+        return namesIn(ZULMetaData::s_metaDataKinds);
     if (value == "RULE")
-        for (const ZULMetaData::FindingRule& rule : ZULMetaData::s_findingRules)
-            found.emplace_back(rule.name);
+        return namesIn(ZULMetaData::s_findingRules);
+    std::vector<std::string> found;
     if (value.find('|') == std::string::npos)
         return found;
     std::istringstream stream(value);

@@ -16,7 +16,6 @@
 #include <algorithm>
 #include <limits>
 #include <memory>
-#include <optional>
 
 namespace Zulm {
 

@@ -30,20 +30,12 @@ struct VerifyOptions {
     bool json = false;
 };
 
-std::vector<std::string> ruleNames() {
-    std::vector<std::string> names;
-    names.reserve(s_findingRules.size());
-    for (const FindingRule& rule : s_findingRules)
-        names.emplace_back(rule.name);
-    return names;
-}
-
 FindingCode ruleNamed(const std::string& name) {
     const auto found = std::find_if(s_findingRules.begin(), s_findingRules.end(),
                                     [&](const FindingRule& rule) { return rule.name == name; });
     if (found == s_findingRules.end())
         throw CLI::ValidationError("--ignore", fmt::format("{} is no rule{}; 'zulm verify --rules' lists them all",
-                                                           name, suggestionFor(name, ruleNames())));
+                                                           name, suggestionFor(name, namesIn(s_findingRules))));
     return found->code;
 }
 

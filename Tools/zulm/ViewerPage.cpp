@@ -1,7 +1,6 @@
 #include "Tools/zulm/ViewerPage.h"
 
 #include "Reports/InfoReport.h"
-#include "Reports/Report.h"
 #include "Reports/Text.h"
 #include "Reports/VerifyReport.h"
 #include "Tools/zulm/Substitutes.h"
