@@ -1,7 +1,7 @@
 // A file for a command of the tool. The first byte chooses the command, the second what the file is called.
 
-#include "Tools/zulm/Commands.h"
 #include "Fuzz/Target.h"
+#include "Tools/zulm/CommandLine.h"
 #include "Tools/zulm/Settings.h"
 
 #include <array>
@@ -64,7 +64,7 @@ int runCommand(Words words) {
     for (std::string& word : words)
         arguments.push_back(word.data());
     Zulm::settings() = {};
-    return Zulm::runCommandLine(static_cast<int>(arguments.size()), arguments.data(), Zulm::commandGroups());
+    return Zulm::runCommandLine(static_cast<int>(arguments.size()), arguments.data());
 }
 
 } // namespace

@@ -36,9 +36,8 @@ Json itemDocument(const LayoutItem& entry) {
 }
 
 /// A file may hold millions of atoms, so they are written as they are met; where they end is found by a second walk.
-void writeReport(Recording& recording, const LayoutVisitor& ends, JsonWriter& writer) {
-    writer.beginObject();
-    writer.members(fileHeader(recording.name()));
+void writeReport(Recording& recording, const LayoutVisitor& ends, RunReport& report) {
+    JsonWriter& writer = report.beginFile(recording.name());
     writer.member("container", containerName(recording.container()));
     writer.member("bytes", recording.size());
     writer.beginArray("items");
@@ -99,16 +98,10 @@ ExitCode showAtoms(const std::string& path, RunReport& report) {
             writeOutput(fmt::format("  ends at {}: {}\n", end.offset, end.reason));
     };
     if (report.isWanted())
-        writeReport(recording, ends, report.writer());
+        writeReport(recording, ends, report);
     else
         print(recording, ends);
     return code;
-}
-
-ExitCode runAtoms(const AtomsOptions& options) {
-    return withReport("atoms", options.json, options.files, [&](RunReport& report) {
-        return forEachFile(options.files, [&](const std::string& path) { return showAtoms(path, report); });
-    });
 }
 
 } // namespace
@@ -119,7 +112,8 @@ void addAtomsCommand(CLI::App& app, Action& chosen) {
     command->add_option("FILE", options->files, "Movies or RIFF files; - is standard input")->required();
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm atoms Recording.mp4");
-    command->callback([options, &chosen] { chosen = [options] { return runAtoms(*options); }; });
+    command->callback(
+        [options, &chosen] { chosen = reportingOnEach("atoms", options->json, options->files, showAtoms); });
 }
 
 } // namespace Zulm

@@ -1,19 +1,16 @@
 #include "Reports/Text.h"
 #include "Tools/zulm/AttachTimes.h"
 #include "Tools/zulm/InputFile.h"
-#include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/SaveTarget.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/MovieDuration.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
-#include <algorithm>
 #include <filesystem>
 #include <set>
 
@@ -30,7 +27,7 @@ struct AttachOptions {
     std::string from;
     TimeOptions times;
     bool replace = false;
-    bool movesIndex = false;
+    SafeMovieSave::FragmentIndex index = SafeMovieSave::FragmentIndex::Leave;
     bool unchecked = false;
     bool json = false;
 };
@@ -189,8 +186,6 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     if (retimed.sources().empty())
         return complainAboutNoStreams(options, ExitDamaged);
     const auto existing = options.replace ? ExistingStreams::Supersede : ExistingStreams::Refuse;
-    const auto index =
-        options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd : SafeMovieSave::FragmentIndex::Leave;
     const AttachPlan plan = movie.planned([&](const ByteSource& bytes, const std::string& path) {
         AttachPlan examined(streams.sources, existing);
         if (options.times.changesTimes())
@@ -198,8 +193,8 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
         examined.requireFor(bytes, path);
         return examined;
     });
-    const AttachResult attached =
-        movie.save("attaching to " + movie.name(), [&](const SafeMovieSave& save) { return save.attach(plan, index); });
+    const AttachResult attached = movie.save(
+        "attaching to " + movie.name(), [&](const SafeMovieSave& save) { return save.attach(plan, options.index); });
     const TimesOutside times{warnOfTimesOutside(movie.name(), duration, retimed.sources()), retimed.entriesRemoved()};
     if (report.isWanted())
         report.add(fileDocument(options, movie.name(), attached, times, streams));
@@ -208,12 +203,6 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     warnOfFragmentIndex(movie.name(), attached.fragmentIndex);
     return worseOf(worseOf(streams.code, retimed.complainAboutCuts()),
                    worseOf(complainAboutLoss(movie.name(), attached.repair), complainAboutCuts(attached)));
-}
-
-ExitCode runAttach(const AttachOptions& options) {
-    std::vector<std::string> files{options.save.movie, options.save.output, options.from};
-    files.insert(files.end(), options.streams.begin(), options.streams.end());
-    return withReport("attach", options.json, files, [&](RunReport& report) { return attachStreams(options, report); });
 }
 
 } // namespace
@@ -228,7 +217,7 @@ void addAttachCommand(CLI::App& app, Action& chosen) {
                       "Attach kinds that are there already: a stream file goes before one of OLDMOVIE, and readers "
                       "take the new one before one of MOVIE, which stays in the file unread");
     addTimeOptions(*command, options->times);
-    addFragmentIndexOption(*command, options->movesIndex);
+    addFragmentIndexOption(*command, options->index);
     command->add_flag("--unchecked", options->unchecked,
                       "Attach a STREAM also if its header names no known kind and version, or if it holds bytes "
                       "but not one whole entry. What --from carries over is never refused for that");
@@ -240,7 +229,10 @@ void addAttachCommand(CLI::App& app, Action& chosen) {
         if (options->streams.empty() && options->from.empty())
             throw CLI::RequiredError("at least one STREAM, or --from OLDMOVIE,");
         requireDestination(options->save);
-        chosen = [options] { return runAttach(*options); };
+        std::vector<std::string> files{options->save.movie, options->save.output, options->from};
+        files.insert(files.end(), options->streams.begin(), options->streams.end());
+        chosen = reporting("attach", options->json, files,
+                           [options](RunReport& report) { return attachStreams(*options, report); });
     });
 }
 

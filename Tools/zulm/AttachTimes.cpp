@@ -9,8 +9,8 @@
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <cmath>
 #include <fstream>
+#include <limits>
 
 namespace Zulm {
 

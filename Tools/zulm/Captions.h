@@ -1,13 +1,23 @@
 #pragma once
 
-// Keystrokes as captions and titles as chapters, placed on the time line of a recording.
+// Keystrokes as captions and titles as chapters, in the files that players and ffmpeg read.
 
-#include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
 
 namespace Zulm {
+
+enum class CaptionFormat {
+    SRT,        ///< SubRip
+    VTT,        ///< WebVTT
+    ASS,        ///< Advanced SubStation Alpha
+    FFMetaData, ///< chapters, as ffmpeg reads and writes them
+    Chapters,   ///< CHAPTER01=..., as muxers and players read them
+};
+
+/// Whether it holds chapters, not captions.
+bool holdsChapters(CaptionFormat format);
 
 /// Shown from `start` to `end`, in seconds.
 struct Caption {
@@ -19,16 +29,9 @@ struct Caption {
 /// Returns the time before which every caption begins, in seconds: the end of the movie, or of what files can hold.
 double endOfCaptions(std::optional<double> duration);
 
-/// A caption in units of a time scale, as it stands in a file.
-struct PlacedCaption {
-    std::int64_t start = 0;
-    std::int64_t end = 0;
-    std::string text;
-};
-
-/// Captions in the order of their times, none overlapping the next and none empty. Those that begin together become
-/// one. All of them must begin before `endOfCaptions(duration)`, and end there at the latest. A title that nothing
-/// follows ends with the movie, or after a few seconds if the length of the movie is not known.
-std::vector<PlacedCaption> placed(std::vector<Caption> captions, double unitsPerSecond, std::optional<double> duration);
+/// Returns a whole file. All captions must begin before `endOfCaptions(duration)`, and end there at the latest. Those
+/// that begin together become one, and none overlaps the next. Texts are UTF-8; what would be markup in the format is
+/// escaped, or kept apart by a character that does not show, and every text is one line.
+std::string formatted(std::vector<Caption> captions, CaptionFormat format, std::optional<double> duration);
 
 } // namespace Zulm

@@ -30,8 +30,7 @@ std::size_t distance(std::string_view left, std::string_view right) {
     return rows[left.size()][right.size()];
 }
 
-} // namespace
-
+/// The candidate that `word` was probably meant to be; empty where none is near.
 std::string nearestTo(std::string_view word, const std::vector<std::string>& candidates) {
     constexpr std::size_t longestWord = 64; // nobody mistypes more
     std::string nearest;
@@ -45,6 +44,8 @@ std::string nearestTo(std::string_view word, const std::vector<std::string>& can
     }
     return least <= 1 + word.size() / 4 ? nearest : std::string();
 }
+
+} // namespace
 
 double requireSeconds(const std::string& name, const std::string& word, Sign sign) {
     const std::optional<double> seconds = secondsFrom(word, sign);

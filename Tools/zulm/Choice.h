@@ -18,11 +18,17 @@
 
 namespace Zulm {
 
-/// The candidate that `word` was probably meant to be; empty where none is near.
-std::string nearestTo(std::string_view word, const std::vector<std::string>& candidates);
-
 /// "; did you mean X?" or nothing.
 std::string suggestionFor(std::string_view word, const std::vector<std::string>& candidates);
+
+/// Returns the names of a table's rows.
+template <class Table>
+std::vector<std::string> namesIn(const Table& table) {
+    std::vector<std::string> names;
+    for (const auto& row : table)
+        names.emplace_back(row.name);
+    return names;
+}
 
 /// The time that `word` stands for, as `secondsFrom` takes it. Throws the usage error of the option `name` if it stands
 /// for none.

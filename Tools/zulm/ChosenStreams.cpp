@@ -31,10 +31,7 @@ bool isIdentifier(const std::string& text) {
 std::string checkKind(const std::string& kind) {
     if (isIdentifier(kind) || findMetaDataKind(kind))
         return {};
-    std::vector<std::string> names;
-    names.reserve(s_metaDataKinds.size());
-    for (const MetaDataKind& registered : s_metaDataKinds)
-        names.emplace_back(registered.name);
+    const std::vector<std::string> names = namesIn(s_metaDataKinds);
     return fmt::format("no kind of stream is called '{}'{} (the kinds are {})", kind, suggestionFor(kind, names),
                        fmt::join(names, ", "));
 }
@@ -55,16 +52,12 @@ CLI::Option* addStreamOption(CLI::App& command, std::vector<std::string>& kinds,
         ->check(CLI::Validator(checkKind, ""));
 }
 
-void requireOneOf(const std::vector<uuid>& fitting, const std::string& option, const std::vector<std::string>& kinds,
-                  const std::string& why) {
-    std::vector<std::string> names;
-    names.reserve(fitting.size());
-    for (const uuid& type : fitting)
-        names.push_back(metaDataKindName(type));
+void requireOneOf(const std::vector<std::string>& fitting, const std::string& option,
+                  const std::vector<std::string>& kinds, const std::string& why) {
     for (const std::string& kind : kinds)
-        if (std::find(fitting.begin(), fitting.end(), typeNamed(kind)) == fitting.end())
+        if (std::find(fitting.begin(), fitting.end(), metaDataKindName(typeNamed(kind))) == fitting.end())
             throw CLI::ValidationError(
-                fmt::format("{} {}: {} {}; choose from {}", option, kind, kind, why, fmt::join(names, ", ")));
+                fmt::format("{} {}: {} {}; choose from {}", option, kind, kind, why, fmt::join(fitting, ", ")));
 }
 
 uuid typeNamed(const std::string& kind) {

@@ -22,17 +22,17 @@ CLI::Option* addStreamOption(CLI::App& command, std::vector<std::string>& kinds,
 
 /// Throws the usage error if one of these option values names none of the fitting kinds. `why` completes the sentence
 /// "KIND ...".
-void requireOneOf(const std::vector<ZULMetaData::uuid>& fitting, const std::string& option,
+void requireOneOf(const std::vector<std::string>& fitting, const std::string& option,
                   const std::vector<std::string>& kinds, const std::string& why);
 
 /// The same with the kinds for which `isFitting.operator()<Kind>()` returns true.
 template <class Predicate>
 void requireKinds(const std::string& option, const std::vector<std::string>& kinds, const std::string& why,
                   Predicate isFitting) {
-    std::vector<ZULMetaData::uuid> fitting;
+    std::vector<std::string> fitting;
     ZULMetaData::RecordedKinds::forEach([&]<class Kind>() {
         if (isFitting.template operator()<Kind>())
-            fitting.push_back(Kind::type);
+            fitting.push_back(ZULMetaData::metaDataKindName(Kind::type));
     });
     requireOneOf(fitting, option, kinds, why);
 }

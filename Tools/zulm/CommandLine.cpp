@@ -9,7 +9,6 @@
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <iterator>
 #include <memory>
 #include <sstream>
 #include <string_view>
@@ -19,6 +18,20 @@
 namespace Zulm {
 
 namespace {
+
+/// Commands that the help shows under one heading.
+struct CommandGroup {
+    const char* heading;
+    std::vector<void (*)(CLI::App& app, Action& chosen)> commands;
+};
+
+/// All commands, in the order of the help.
+const std::vector<CommandGroup> s_commandGroups{
+    {"Look", {addInfoCommand, addAtomsCommand, addDumpCommand, addDiffCommand, addGrepCommand, addViewCommand}},
+    {"Check and rescue", {addVerifyCommand, addRepairCommand, addSalvageCommand}},
+    {"Change", {addAttachCommand, addStampCommand, addRedactCommand, addCompactCommand, addDetachCommand}},
+    {"Convert", {addExtractCommand, addConvertCommand}},
+    {"Try", {addDemoCommand}}};
 
 std::vector<std::string> commandNames(const CLI::App& app) {
     std::vector<std::string> names;
@@ -33,10 +46,6 @@ std::vector<std::string> optionNames(const CLI::App& app) {
         for (const std::string& name : option->get_lnames())
             names.push_back("--" + name);
     return names;
-}
-
-bool isOneOf(const std::vector<std::string>& names, const std::string& name) {
-    return std::find(names.begin(), names.end(), name) != names.end();
 }
 
 /// The command that was named, or the tool itself.
@@ -66,7 +75,7 @@ std::string unexpectedText(const CLI::App& app) {
         return fmt::format("{} is one argument too many", first);
     const std::string name = first.substr(0, first.find('='));
     auto names = optionNames(command);
-    if (isOneOf(names, name))
+    if (std::find(names.begin(), names.end(), name) != names.end())
         return fmt::format("{0} is an option of 'zulm {1}': it follows {1}", name, command.get_name());
     for (const std::string& global : optionNames(app))
         names.push_back(global);
@@ -179,14 +188,14 @@ void refuseStandardOutput(CLI::App& command) {
             option->check(CLI::Validator(refused, ""));
 }
 
-void define(CLI::App& app, Action& chosen, const std::vector<CommandGroup>& groups) {
+void define(CLI::App& app, Action& chosen) {
     app.set_version_flag("--version", "zulm " ZULM_VERSION, "Print the version and end");
     app.set_help_flag("-h,--help", "Print this help and end");
     app.formatter(std::make_shared<HelpPage>());
     app.require_subcommand(0, 1);
     app.fallthrough();
     addSettings(app);
-    for (const CommandGroup& group : groups)
+    for (const CommandGroup& group : s_commandGroups)
         for (const auto addCommand : group.commands) {
             addCommand(app, chosen);
             CLI::App* command = app.get_subcommands([](CLI::App*) { return true; }).back();
@@ -202,12 +211,12 @@ void define(CLI::App& app, Action& chosen, const std::vector<CommandGroup>& grou
 
 } // namespace
 
-ExitCode runCommandLine(int argc, char** argv, const std::vector<CommandGroup>& groups) {
+ExitCode runCommandLine(int argc, char** argv) {
     CLI::App app("Looks into the metadata of screen recordings, checks and rescues it, and puts it into movies.",
                  "zulm");
     Action chosen;
     std::string format;
-    define(app, chosen, groups);
+    define(app, chosen);
     app.add_option("--generate", format)->group("");
     try {
         std::vector<std::string> words = wordsOf(argc, argv);

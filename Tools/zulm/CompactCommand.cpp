@@ -55,51 +55,38 @@ std::unique_ptr<OutputFile> outputFor(const TailOptions& options) {
                                         options.save.force);
 }
 
-/// A copy that was made.
-struct Compaction {
-    const RecordingCompaction& result;
-    std::uint64_t sizeBefore;
-};
-
 Json streamDocument(const StreamInfo& stream) {
     return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}, {"bytes", stream.presentBytes}};
 }
 
-Json fileDocument(const TailOptions& options, const Compaction& done) {
+Json fileDocument(const TailOptions& options, const RecordingCompaction& done, std::uint64_t sizeBefore) {
     Json file = fileHeader(options.save.movie);
     addText(file, "output", options.name());
-    file.update(Json{{"bytes_before", done.sizeBefore},
-                     {"bytes_after", done.result.sizeAfter()},
-                     {"streams_left_out", done.result.streamsLeftOut()},
-                     {"creators_left_out", done.result.creatorsLeftOut()},
+    file.update(Json{{"bytes_before", sizeBefore},
+                     {"bytes_after", done.sizeAfter()},
+                     {"streams_left_out", done.streamsLeftOut()},
+                     {"creators_left_out", done.creatorsLeftOut()},
                      {"streams", Json::array()}});
-    for (const StreamInfo& stream : done.result.streams())
+    for (const StreamInfo& stream : done.streams())
         file["streams"].push_back(streamDocument(stream));
     return file;
 }
 
-void print(const TailOptions& options, const Compaction& done) {
+void print(const TailOptions& options, const RecordingCompaction& done, std::uint64_t sizeBefore) {
     writeOutput(fmt::format("{}: {} stream{} left out, {} kept; {} bytes became {}\n", shown(options.name()),
-                            done.result.streamsLeftOut(), done.result.streamsLeftOut() == 1 ? "" : "s",
-                            done.result.streams().size(), done.sizeBefore, done.result.sizeAfter()));
+                            done.streamsLeftOut(), done.streamsLeftOut() == 1 ? "" : "s", done.streams().size(),
+                            sizeBefore, done.sizeAfter()));
 }
 
-/// Throws `Failure` with what to do next.
-[[noreturn]] void fail(const CompactionError& error, const Recording& recording, const std::string& output) {
+/// What a person can do about it.
+std::string hintFor(CompactionError::Reason reason, const std::string& name) {
     using Reason = CompactionError::Reason;
-    const std::string file = shellWord(recording.name());
-    switch (error.reason()) {
-    case Reason::Repairable:
-        throw Failure(
-            fmt::format("{}: {}; 'zulm repair {} -o OUT' mends it first", recording.name(), error.what(), file));
+    switch (reason) {
+    case Reason::Repairable: return fmt::format("; 'zulm repair {} -o OUT' mends it first", shellWord(name));
     case Reason::Damaged:
-        throw Failure(fmt::format("{}: {}; 'zulm salvage {} -o DIR' searches it for metadata streams", recording.name(),
-                                  error.what(), file));
-    case Reason::UnreachableStream:
-        throw Failure(
-            fmt::format("{}: {}; 'zulm salvage {} -o DIR' writes them out", recording.name(), error.what(), file));
-    case Reason::CannotWrite: throw Failure(fmt::format("{}: {}", output, error.what()));
-    default: throw Failure(fmt::format("{}: {}", recording.name(), error.what()));
+        return fmt::format("; 'zulm salvage {} -o DIR' searches it for metadata streams", shellWord(name));
+    case Reason::UnreachableStream: return fmt::format("; 'zulm salvage {} -o DIR' writes them out", shellWord(name));
+    default: return {};
     }
 }
 
@@ -111,11 +98,10 @@ ExitCode writeCopy(const TailOptions& options, Recording& recording, RunReport& 
     output->copyFrom(recording.path(), 0, compaction.copiedBytes());
     compaction.complete(output->temporaryPath());
     output->commit();
-    const Compaction done{compaction, recording.size()};
     if (report.isWanted())
-        report.add(fileDocument(options, done));
+        report.add(fileDocument(options, compaction, recording.size()));
     else if (!settings().quiet)
-        print(options, done);
+        print(options, compaction, recording.size());
     if (compaction.bytesCut() == 0)
         return ExitFine;
     complain(fmt::format("{}: left out {} bytes of incomplete entries", options.name(), compaction.bytesCut()));
@@ -131,13 +117,10 @@ ExitCode writeTail(const TailOptions& options, RunReport& report) {
     try {
         return writeCopy(options, recording, report);
     } catch (const CompactionError& error) {
-        fail(error, recording, options.name());
+        const bool isAboutCopy = error.reason() == CompactionError::Reason::CannotWrite;
+        throw Failure(fmt::format("{}: {}{}", isAboutCopy ? options.name() : recording.name(), error.what(),
+                                  hintFor(error.reason(), recording.name())));
     }
-}
-
-ExitCode runTail(const TailOptions& options) {
-    return withReport(options.command(), options.json, {options.save.movie},
-                      [&](RunReport& report) { return writeTail(options, report); });
 }
 
 CLI::App* addTailCommand(CLI::App& app, Action& chosen, KeptMetaData kept, const std::string& description) {
@@ -151,7 +134,8 @@ CLI::App* addTailCommand(CLI::App& app, Action& chosen, KeptMetaData kept, const
         requireDestination(options->save);
         if (options->save.inPlace && options->save.movie == "-")
             throw CLI::ValidationError("--in-place: standard input cannot be changed; name a file, or use -o OUT");
-        chosen = [options] { return runTail(*options); };
+        chosen = reporting(options->command(), options->json, {options->save.movie},
+                           [options](RunReport& report) { return writeTail(*options, report); });
     });
     return command;
 }

@@ -1,11 +1,11 @@
 // The manual as completions for the shells.
 
+#include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Manual.h"
+#include "Tools/zulm/Substitutes.h"
 
 #include <fmt/core.h>
 #include <fmt/ranges.h>
-
-#include <algorithm>
 
 namespace Zulm {
 
@@ -20,17 +20,9 @@ std::vector<std::string> namesOf(const std::vector<ManualOption>& options) {
 }
 
 std::vector<ManualOption> withGlobalOptions(const Manual& manual, const ManualCommand& command) {
-    std::vector<ManualOption> options = command.options;
-    for (const ManualOption& option : globalOptions(manual, command))
-        options.push_back(option);
+    std::vector<ManualOption> options = globalOptions(manual, command);
+    options.insert(options.begin(), command.options.begin(), command.options.end());
     return options;
-}
-
-std::vector<std::string> commandNames(const Manual& manual) {
-    std::vector<std::string> names;
-    for (const ManualCommand& command : manual.commands)
-        names.push_back(command.name);
-    return names;
 }
 
 bool isFolder(const ManualOption& option) {
@@ -44,10 +36,7 @@ bool isFile(const ManualOption& option) {
 
 /// In single quotes of a shell.
 std::string quoted(const std::string& text) {
-    std::string escaped;
-    for (const char c : text)
-        escaped += c == '\'' ? "'\\''" : std::string(1, c);
-    return "'" + escaped + "'";
+    return "'" + substituted(text, {{'\'', "'\\''"}}) + "'";
 }
 
 /// What an option's value is completed with, as a line of bash. Names of files are left to bash itself, which knows how
@@ -76,13 +65,7 @@ std::string bashCases(const std::vector<ManualOption>& options, const std::strin
 
 /// The characters that mean something in an option given to _arguments.
 std::string zshText(const std::string& text) {
-    std::string escaped;
-    for (const char c : text) {
-        if (c == '[' || c == ']' || c == ':' || c == '\\')
-            escaped += '\\';
-        escaped += c;
-    }
-    return escaped;
+    return substituted(text, {{'[', "\\["}, {']', "\\]"}, {':', "\\:"}, {'\\', "\\\\"}});
 }
 
 std::string zshAction(const ManualOption& option) {
@@ -163,11 +146,11 @@ complete -o default -F _zulm zulm
     const auto fill = [&script](const std::string& place, const std::string& text) {
         script.replace(script.find(place), place.size(), text);
     };
-    fill("COMMANDS", fmt::format("{}", fmt::join(commandNames(manual), "|")));
+    fill("COMMANDS", fmt::format("{}", fmt::join(namesIn(manual.commands), "|")));
     fill("CASES", cases);
     fill("OPTIONS", options);
     fill("GLOBAL", fmt::format("{}", fmt::join(namesOf(manual.options), " ")));
-    fill("NAMES", fmt::format("{}", fmt::join(commandNames(manual), " ")));
+    fill("NAMES", fmt::format("{}", fmt::join(namesIn(manual.commands), " ")));
     return script;
 }
 

@@ -1,5 +1,5 @@
 #include "Reports/Text.h"
-#include "Tools/zulm/CaptionFormat.h"
+#include "Tools/zulm/Captions.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/InputFile.h"
@@ -9,7 +9,6 @@
 
 #include <fmt/core.h>
 
-#include <algorithm>
 #include <limits>
 #include <memory>
 #include <optional>
@@ -137,8 +136,7 @@ ExitCode runConvert(const ConvertOptions& options) {
     CaptionReader reader(options, recording, duration);
     for (const StreamInfo& stream : streams)
         reader.read(stream);
-    const std::string text =
-        formatted(placed(reader.captions(), unitsPerSecond(options.format), duration), options.format);
+    const std::string text = formatted(reader.captions(), options.format, duration);
     if (options.output.empty() || options.output == "-")
         writeOutput(text);
     else

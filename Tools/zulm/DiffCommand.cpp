@@ -121,34 +121,68 @@ bool haveSameBytes(const ByteSource& left, const ByteSource& right) {
     return true;
 }
 
-/// "NAME: differs", before what is printed first of a stream.
-class Heading {
-public:
-    explicit Heading(std::string name) : name_(std::move(name)) {}
-
-    void print() {
-        if (!std::exchange(isPrinted_, true))
-            writeOutput(fmt::format("{}: differs\n", name_));
-    }
-
-    bool isPrinted() const { return isPrinted_; }
-    const std::string& name() const { return name_; }
-
-private:
-    std::string name_;
-    bool isPrinted_ = false;
-};
+Json streamHeader(const StreamInfo& stream) {
+    return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}};
+}
 
 /// Compares two streams of one kind. Entries belong together by their times: of two that come next, the one with the
 /// smaller time is only on its side; with equal times, or none, they are one entry that may have changed.
 class StreamComparison {
 public:
-    /// The differences become elements of the array that `writer` has open; they are printed if it is null.
-    StreamComparison(const DiffOptions& options, Side& left, Side& right, Heading& heading, JsonWriter* writer)
-        : options_(options), tolerance_(options.tolerance.value_or(0)), left_(left), right_(right), heading_(heading),
+    /// The streams become an element of the array that `writer` has open; they are printed if it is null.
+    StreamComparison(const DiffOptions& options, Side& left, Side& right, const StreamInfo& stream, JsonWriter* writer)
+        : options_(options), tolerance_(options.tolerance.value_or(0)), left_(left), right_(right), stream_(stream),
           writer_(writer) {}
 
-    void run() {
+    /// Returns whether they are the same, as far as that was asked for.
+    bool run() {
+        if (!options_.tolerance && !writer_)
+            printHeading();
+        if (writer_) {
+            writer_->beginObject();
+            writer_->members(streamHeader(stream_));
+        }
+        const bool haveSameHeader = compareHeaders();
+        if (writer_)
+            writer_->beginArray("differences");
+        compareEntries();
+        const bool areSame = options_.tolerance && haveSameHeader && foundNothing();
+        if (writer_) {
+            writer_->end();
+            writer_->member("status", areSame ? "same" : "changed");
+            writer_->members(counts());
+            writer_->end();
+        } else if (!foundNothing() || isHeadingPrinted_) {
+            printSummary();
+        }
+        return areSame;
+    }
+
+private:
+    bool compareHeaders() {
+        const auto left = left_.header();
+        const auto right = right_.header();
+        if (!left || !right)
+            return left.has_value() == right.has_value();
+        const bool hasSameVersion = compareNumbers("version", left->version, right->version);
+        return compareNumbers("entry_size", left->fixedEntrySize, right->fixedEntrySize) && hasSameVersion;
+    }
+
+    template <class Number>
+    bool compareNumbers(const char* name, Number left, Number right) {
+        if (left == right)
+            return true;
+        if (writer_) {
+            writer_->member(name, {{"a", left}, {"b", right}});
+        } else {
+            printHeading();
+            if (!settings().quiet)
+                writeOutput(fmt::format("  its header's {}: {} and {}\n", name, left, right));
+        }
+        return false;
+    }
+
+    void compareEntries() {
         while (left_.hasEntry() || right_.hasEntry()) {
             if (areSame())
                 skipSame();
@@ -159,8 +193,6 @@ public:
             else
                 take("changed", changed_, true, true);
         }
-        if (!writer_ && (!foundNothing() || heading_.isPrinted()))
-            printSummary();
     }
 
     bool foundNothing() const { return differences() == 0 && left_.rest() == 0 && right_.rest() == 0; }
@@ -173,7 +205,6 @@ public:
                 {"complete", differences() <= listed_}};
     }
 
-private:
     std::uint64_t differences() const { return changed_ + added_ + removed_; }
 
     bool areSame() const {
@@ -204,7 +235,7 @@ private:
         ++listed_;
         if (writer_)
             return writer_->element({{"change", change}, {"a", left}, {"b", right}});
-        heading_.print();
+        printHeading();
         if (settings().quiet)
             return;
         const bool isChange = !left.is_null() && !right.is_null();
@@ -221,13 +252,18 @@ private:
         writeOutput(fmt::format("  {} {}\n", mark, isDecoded ? textLine(entry) : entry["base64"].get<std::string>()));
     }
 
-    void printSummary() const {
-        heading_.print();
+    void printHeading() {
+        if (!std::exchange(isHeadingPrinted_, true))
+            writeOutput(fmt::format("{}: differs\n", stream_.name()));
+    }
+
+    void printSummary() {
+        printHeading();
         if (settings().quiet)
             return;
         if (differences() > listed_)
             writeOutput(fmt::format("  ... and {} more; '--limit 0' lists all\n", differences() - listed_));
-        writeOutput(fmt::format("  {}: {} changed, {} added, {} removed, {} the same\n", heading_.name(), changed_,
+        writeOutput(fmt::format("  {}: {} changed, {} added, {} removed, {} the same\n", stream_.name(), changed_,
                                 added_, removed_, same_));
         if (left_.rest() != right_.rest())
             writeOutput(fmt::format("  after the last entry: {} and {} bytes\n", left_.rest(), right_.rest()));
@@ -237,8 +273,9 @@ private:
     double tolerance_;
     Side& left_;
     Side& right_;
-    Heading& heading_;
+    const StreamInfo& stream_;
     JsonWriter* writer_;
+    bool isHeadingPrinted_ = false;
     std::uint64_t same_ = 0;
     std::uint64_t changed_ = 0;
     std::uint64_t added_ = 0;
@@ -269,10 +306,6 @@ public:
     ExitCode code() const { return code_; }
 
 private:
-    static Json streamHeader(const StreamInfo& stream) {
-        return {{"kind", kindDocument(stream.type)}, {"uuid", uuidText(stream.type)}};
-    }
-
     static Json streamDocument(const StreamInfo& stream, const char* status) {
         Json document = streamHeader(stream);
         document["status"] = status;
@@ -298,51 +331,10 @@ private:
     void compareEntries(const StreamInfo& leftStream, const StreamInfo& rightStream) {
         Side left(left_, leftStream);
         Side right(right_, rightStream);
-        Heading heading(leftStream.name());
-        if (!options_.tolerance && !writer_)
-            heading.print();
-        if (writer_) {
-            writer_->beginObject();
-            writer_->members(streamHeader(leftStream));
-        }
-        const bool haveSameHeader = compareHeaders(left.header(), right.header(), heading);
-        if (writer_)
-            writer_->beginArray("differences");
-        StreamComparison entries(options_, left, right, heading, writer_);
-        entries.run();
-        const bool areSame = options_.tolerance && haveSameHeader && entries.foundNothing();
-        if (!areSame)
+        if (!StreamComparison(options_, left, right, leftStream, writer_).run())
             code_ = ExitDamaged;
-        if (writer_) {
-            writer_->end();
-            writer_->member("status", areSame ? "same" : "changed");
-            writer_->members(entries.counts());
-            writer_->end();
-        }
         left.complainAboutRest();
         right.complainAboutRest();
-    }
-
-    bool compareHeaders(const std::optional<MetaDataHeader>& left, const std::optional<MetaDataHeader>& right,
-                        Heading& heading) const {
-        if (!left || !right)
-            return left.has_value() == right.has_value();
-        const bool hasSameVersion = compareNumbers("version", left->version, right->version, heading);
-        return compareNumbers("entry_size", left->fixedEntrySize, right->fixedEntrySize, heading) && hasSameVersion;
-    }
-
-    template <class Number>
-    bool compareNumbers(const char* name, Number left, Number right, Heading& heading) const {
-        if (left == right)
-            return true;
-        if (writer_) {
-            writer_->member(name, {{"a", left}, {"b", right}});
-        } else {
-            heading.print();
-            if (!settings().quiet)
-                writeOutput(fmt::format("  its header's {}: {} and {}\n", name, left, right));
-        }
-        return false;
     }
 
     const DiffOptions& options_;
@@ -363,8 +355,7 @@ ExitCode diff(const DiffOptions& options, RunReport& report) {
         return worseOf(complainAboutNothing(left, options.kinds), complainAboutNothing(right, options.kinds));
     JsonWriter* const writer = report.isWanted() ? &report.writer() : nullptr;
     if (writer) {
-        writer->beginObject();
-        writer->members(fileHeader(left.name()));
+        report.beginFile(left.name());
         writer->member("other", fileHeader(right.name()));
         writer->beginArray("streams");
     }
@@ -375,11 +366,6 @@ ExitCode diff(const DiffOptions& options, RunReport& report) {
         writer->member("same", comparison.code() == ExitFine);
     }
     return comparison.code();
-}
-
-ExitCode runDiff(const DiffOptions& options) {
-    return withReport("diff", options.json, {options.left, options.right},
-                      [&](RunReport& report) { return diff(options, report); });
 }
 
 } // namespace
@@ -404,7 +390,8 @@ void addDiffCommand(CLI::App& app, Action& chosen) {
     command->callback([options, &chosen] {
         if (options->left == "-" && options->right == "-")
             throw CLI::ValidationError("only one of A and B can be standard input");
-        chosen = [options] { return runDiff(*options); };
+        chosen = reporting("diff", options->json, {options->left, options->right},
+                           [options](RunReport& report) { return diff(*options, report); });
     });
 }
 

@@ -11,7 +11,6 @@
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
-#include "Tools/zulm/StandardStreams.h"
 
 #include <fmt/core.h>
 
@@ -166,16 +165,12 @@ ExitCode dumpFile(const std::string& path, const DumpOptions& options, Printout&
     return worst;
 }
 
-ExitCode runDump(const DumpOptions& options) {
-    const bool isDocument = options.format == EntryFormat::JSON;
-    const auto dump = [&](RunReport& report) {
-        if (!options.imageFolder.empty())
-            createFolder(options.imageFolder);
-        Printout printout(options.format, options.columns, options.files.size() > 1,
-                          isDocument ? &report.writer() : nullptr);
-        return forEachFile(options.files, [&](const std::string& path) { return dumpFile(path, options, printout); });
-    };
-    return withReport("dump", isDocument, options.files, dump, JsonWriter::Style::Lines);
+ExitCode dump(const DumpOptions& options, RunReport& report) {
+    if (!options.imageFolder.empty())
+        createFolder(options.imageFolder);
+    Printout printout(options.format, options.columns, options.files.size() > 1,
+                      report.isWanted() ? &report.writer() : nullptr);
+    return forEachFile(options.files, [&](const std::string& path) { return dumpFile(path, options, printout); });
 }
 
 } // namespace
@@ -211,7 +206,9 @@ void addDumpCommand(CLI::App& app, Action& chosen) {
             throw CLI::ValidationError("--from", fmt::format("{} is later than --to {}", *options->from, *options->to));
         if (!options->imageFolder.empty() && options->files.size() > 1)
             throw CLI::ValidationError("--images", "the images of one FILE can be written at once, not of several");
-        chosen = [options] { return runDump(*options); };
+        chosen = reporting(
+            "dump", options->format == EntryFormat::JSON, options->files,
+            [options](RunReport& report) { return dump(*options, report); }, JsonWriter::Style::Lines);
     });
 }
 

@@ -36,12 +36,6 @@ ExitCode complainAboutCut(const std::string& file, const StreamInfo& stream) {
     return ExitDamaged;
 }
 
-void beginFile(JsonWriter& writer, const std::string& name) {
-    writer.beginObject();
-    writer.members(fileHeader(name));
-    writer.beginArray("streams");
-}
-
 Json streamDocument(const StreamInfo& stream, const std::string& output) {
     Json document{{"kind", kindDocument(stream.type)},
                   {"uuid", uuidText(stream.type)},
@@ -52,14 +46,6 @@ Json streamDocument(const StreamInfo& stream, const std::string& output) {
     return document;
 }
 
-std::vector<std::string> outputsFor(const std::vector<StreamInfo>& streams, const std::string& folder) {
-    std::vector<std::string> outputs;
-    outputs.reserve(streams.size());
-    for (const StreamInfo& stream : streams)
-        outputs.push_back(streamFileIn(folder, stream.type));
-    return outputs;
-}
-
 ExitCode extract(const ExtractOptions& options, RunReport& report) {
     const InputFile input(options.file);
     Recording recording = input.open();
@@ -67,10 +53,12 @@ ExitCode extract(const ExtractOptions& options, RunReport& report) {
     if (streams.empty())
         return complainAboutNothing(recording, options.kinds);
     createFolder(options.folder);
-    const std::vector<std::string> outputs = outputsFor(streams, options.folder);
+    std::vector<std::string> outputs;
+    for (const StreamInfo& stream : streams)
+        outputs.push_back(streamFileIn(options.folder, stream.type));
     requireFree(outputs, options.force);
     if (report.isWanted())
-        beginFile(report.writer(), input.name());
+        report.beginFile(input.name()).beginArray("streams");
     ExitCode worst = ExitFine;
     for (std::size_t i = 0; i < streams.size(); ++i) {
         writePart(input, streams[i].offset, streams[i].presentBytes, outputs[i], options.force);
@@ -81,11 +69,6 @@ ExitCode extract(const ExtractOptions& options, RunReport& report) {
             writeOutput(fmt::format("{}: {} bytes\n", shown(outputs[i]), streams[i].presentBytes));
     }
     return worst;
-}
-
-ExitCode runExtract(const ExtractOptions& options) {
-    return withReport("extract", options.json, {options.file},
-                      [&](RunReport& report) { return extract(options, report); });
 }
 
 } // namespace
@@ -105,7 +88,10 @@ void addExtractCommand(CLI::App& app, Action& chosen) {
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm extract Recording.mp4 -o streams\n"
                     "zulm extract Recording.mp4 -o streams --stream keyboardAction");
-    command->callback([options, &chosen] { chosen = [options] { return runExtract(*options); }; });
+    command->callback([options, &chosen] {
+        chosen = reporting("extract", options->json, {options->file},
+                           [options](RunReport& report) { return extract(*options, report); });
+    });
 }
 
 } // namespace Zulm

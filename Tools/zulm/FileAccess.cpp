@@ -5,7 +5,6 @@
 #include <fmt/core.h>
 
 #include <filesystem>
-#include <optional>
 #include <system_error>
 #include <unistd.h>
 
@@ -42,36 +41,32 @@ mode_t readers(mode_t mode) {
     return read | read >> 1 | read >> 2;
 }
 
+/// The permissions of a file, as they would be if its group were `group`: members of another group are others.
+mode_t allowedBy(const struct stat& input, gid_t group) {
+    const mode_t mode = input.st_mode & s_all;
+    return input.st_gid == group ? mode : (mode & ~s_group) | (mode & mode << 3 & s_group);
+}
+
 } // namespace
 
-FileAccess::FileAccess(const std::string& path, const std::vector<std::string>& inputs) {
-    if (const auto replaced = statusOf(path)) {
-        replaces_ = true;
-        replaced_ = *replaced;
-    }
+FileAccess::FileAccess(const std::string& path, const std::vector<std::string>& inputs) : replaced_(statusOf(path)) {
     for (const std::string& input : inputs)
         if (const auto status = statusOfInput(input); status && S_ISREG(status->st_mode))
             inputs_.push_back(*status);
 }
 
 void FileAccess::applyTo(const std::string& file) const {
-    if (replaces_ && chown(file.c_str(), replaced_.st_uid, replaced_.st_gid) != 0)
-        static_cast<void>(chown(file.c_str(), static_cast<uid_t>(-1), replaced_.st_gid) == 0); // if it is ours
+    if (replaced_ && chown(file.c_str(), replaced_->st_uid, replaced_->st_gid) != 0)
+        static_cast<void>(chown(file.c_str(), static_cast<uid_t>(-1), replaced_->st_gid) == 0); // if it is ours
     const auto status = statusOf(file);
     if (!status)
         return;
-    mode_t mode = replaces_ ? allowedBy(replaced_, status->st_gid) : defaultMode();
+    mode_t mode = replaced_ ? allowedBy(*replaced_, status->st_gid) : defaultMode();
     for (const struct stat& input : inputs_) {
         const mode_t allowed = allowedBy(input, status->st_gid);
-        mode &= replaces_ ? readers(allowed) : allowed;
+        mode &= replaced_ ? readers(allowed) : allowed;
     }
     static_cast<void>(chmod(file.c_str(), mode) == 0); // it stays private otherwise
-}
-
-/// The permissions of a file, as they would be if its group were `group`: members of another group are others.
-mode_t FileAccess::allowedBy(const struct stat& input, gid_t group) const {
-    const mode_t mode = input.st_mode & s_all;
-    return input.st_gid == group ? mode : (mode & ~s_group) | (mode & mode << 3 & s_group);
 }
 
 bool isInput(const std::string& path, const std::string& input) {

@@ -2,6 +2,7 @@
 
 // Where outputs go, and who may read them: nobody who may not read all of their inputs.
 
+#include <optional>
 #include <string>
 #include <sys/stat.h>
 #include <vector>
@@ -18,10 +19,7 @@ public:
     void applyTo(const std::string& file) const;
 
 private:
-    mode_t allowedBy(const struct stat& input, gid_t group) const;
-
-    bool replaces_ = false;
-    struct stat replaced_ {};
+    std::optional<struct stat> replaced_;
     std::vector<struct stat> inputs_; ///< of files, not of pipes
 };
 

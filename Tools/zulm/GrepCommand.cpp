@@ -14,7 +14,6 @@
 #include <memory>
 #include <optional>
 #include <system_error>
-#include <utility>
 
 namespace Zulm {
 
@@ -52,7 +51,7 @@ public:
     /// 0 where something matched, 4 where nothing did, 3 where not everything could be searched.
     ExitCode run() {
         if (report_.isWanted())
-            beginFile(report_.writer());
+            report_.beginFile(input_.name()).beginArray("matches");
         for (const StreamInfo& stream : chosenStreams(recording_, options_.kinds))
             RecordedKinds::visit(stream.type, [&]<class Kind>() {
                 if constexpr (holdsTexts<Kind>)
@@ -65,12 +64,6 @@ public:
     }
 
 private:
-    void beginFile(JsonWriter& writer) const {
-        writer.beginObject();
-        writer.members(fileHeader(input_.name()));
-        writer.beginArray("matches");
-    }
-
     template <class Value>
     void search(const StreamInfo& stream) {
         StreamEntries entries = recording_.entriesOf(stream);
@@ -222,10 +215,6 @@ ExitCode grep(const GrepOptions& options, RunReport& report) {
     return search.code();
 }
 
-ExitCode runGrep(const GrepOptions& options) {
-    return withReport("grep", options.json, options.files, [&](RunReport& report) { return grep(options, report); });
-}
-
 } // namespace
 
 void addGrepCommand(CLI::App& app, Action& chosen) {
@@ -264,7 +253,8 @@ void addGrepCommand(CLI::App& app, Action& chosen) {
         requireKinds("--stream", options->kinds, "has no text to search",
                      []<class Kind>() { return holdsTexts<Kind>; });
         const TextPattern checked(options->pattern, options->ignoreCase, options->isFixed);
-        chosen = [options] { return runGrep(*options); };
+        chosen = reporting("grep", options->json, options->files,
+                           [options](RunReport& report) { return grep(*options, report); });
     });
 }
 

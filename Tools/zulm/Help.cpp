@@ -91,7 +91,7 @@ std::string commandsOf(const Manual& manual) {
 
 std::string toolPage(const Manual& manual) {
     std::vector<Row> codes;
-    for (const auto& [code, meaning] : exitCodeMeanings())
+    for (const auto& [code, meaning] : s_exitCodes)
         codes.emplace_back(fmt::format("{:<5}", code), meaning);
     return wrapped(manual.description, 0) + "\n\nUsage: zulm [OPTIONS] COMMAND ...\n" + commandsOf(manual) +
            section("Options of every command", table(rowsOf(manual.options, false))) +

@@ -95,12 +95,6 @@ ExitCode showInfo(const std::string& path, RunReport& report) {
     return code;
 }
 
-ExitCode runInfo(const InfoOptions& options) {
-    return withReport("info", options.json, options.files, [&](RunReport& report) {
-        return forEachFile(options.files, [&](const std::string& path) { return showInfo(path, report); });
-    });
-}
-
 } // namespace
 
 void addInfoCommand(CLI::App& app, Action& chosen) {
@@ -109,7 +103,8 @@ void addInfoCommand(CLI::App& app, Action& chosen) {
     command->add_option("FILE", options->files, "Movies, RIFF files or stream files; - is standard input")->required();
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm info Recording.mp4\nzulm info --json *.mp4");
-    command->callback([options, &chosen] { chosen = [options] { return runInfo(*options); }; });
+    command->callback(
+        [options, &chosen] { chosen = reportingOnEach("info", options->json, options->files, showInfo); });
 }
 
 } // namespace Zulm

@@ -21,6 +21,8 @@
 
 namespace Zulm {
 
+using ZULMetaData::uninterrupted;
+
 namespace {
 
 constexpr std::string_view s_standardInput = "-";
@@ -29,9 +31,7 @@ constexpr std::string_view s_standardInput = "-";
 std::size_t readInput(char* bytes, std::size_t size) {
     std::size_t filled = 0;
     while (filled < size) {
-        const ssize_t got = read(STDIN_FILENO, bytes + filled, size - filled);
-        if (got < 0 && errno == EINTR)
-            continue;
+        const ssize_t got = uninterrupted([&] { return read(STDIN_FILENO, bytes + filled, size - filled); });
         if (got < 0)
             throw Failure(fmt::format("{}: standard input cannot be read: {}", s_standardInput, std::strerror(errno)));
         if (got == 0)
@@ -43,9 +43,7 @@ std::size_t readInput(char* bytes, std::size_t size) {
 
 void writeAll(int file, const char* bytes, std::size_t size) {
     while (size > 0) {
-        const ssize_t put = write(file, bytes, size);
-        if (put < 0 && errno == EINTR)
-            continue;
+        const ssize_t put = uninterrupted([&] { return write(file, bytes, size); });
         if (put < 0)
             throw Failure(
                 fmt::format("{}: standard input cannot be kept in a temporary file: {}; set TMPDIR to another folder",

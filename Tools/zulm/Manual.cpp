@@ -1,13 +1,11 @@
 #include "Tools/zulm/Manual.h"
 
+#include "Tools/zulm/Choice.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
 #include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
 
-#include <fmt/core.h>
-
 #include <algorithm>
 #include <sstream>
-#include <utility>
 
 namespace Zulm {
 
@@ -69,26 +67,12 @@ const char* const s_aboutOutput =
     "UTF-8, \\u{N} for another character, two backslashes for one. JSON has the texts themselves, and the bytes "
     "of one that is not UTF-8 beside it as KEY_base64.";
 
-const std::vector<ExitCodeMeaning>& exitCodeMeanings() {
-    static const std::vector<ExitCodeMeaning> meanings{
-        {"0", "Everything is fine."},
-        {"1", "A file could not be read, or a result could not be written."},
-        {"2", "The command line is wrong. Nothing was done."},
-        {"3", "The command did its work, but found loss or damage."},
-        {"4", "The file can be read, but holds no recording metadata."},
-        {"128+n", "Signal n ended the command. Unfinished files were removed."},
-    };
-    return meanings;
-}
-
 std::vector<std::string> ManualOption::choices() const {
-    std::vector<std::string> found;
     if (value == "KIND")
-        for (const ZULMetaData::MetaDataKind& kind : ZULMetaData::s_metaDataKinds)
-            found.emplace_back(kind.name);
+        return namesIn(ZULMetaData::s_metaDataKinds);
     if (value == "RULE")
-        for (const ZULMetaData::FindingRule& rule : ZULMetaData::s_findingRules)
-            found.emplace_back(rule.name);
+        return namesIn(ZULMetaData::s_findingRules);
+    std::vector<std::string> found;
     if (value.find('|') == std::string::npos)
         return found;
     std::istringstream stream(value);

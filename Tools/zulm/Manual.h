@@ -5,6 +5,7 @@
 #include <CLI/CLI.hpp>
 
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace Zulm {
@@ -52,13 +53,15 @@ std::vector<ManualOption> globalOptions(const Manual& manual, const ManualComman
 /// The commands' groups in their order.
 std::vector<std::string> groupsOf(const Manual& manual);
 
-struct ExitCodeMeaning {
-    const char* code;
-    const char* meaning;
+/// All exit codes with their meanings, for every page.
+inline constexpr std::pair<const char*, const char*> s_exitCodes[]{
+    {"0", "Everything is fine."},
+    {"1", "A file could not be read, or a result could not be written."},
+    {"2", "The command line is wrong. Nothing was done."},
+    {"3", "The command did its work, but found loss or damage."},
+    {"4", "The file can be read, but holds no recording metadata."},
+    {"128+n", "Signal n ended the command. Unfinished files were removed."},
 };
-
-/// All of them, for every page.
-const std::vector<ExitCodeMeaning>& exitCodeMeanings();
 
 /// What every page says about what is printed.
 extern const char* const s_aboutOutput;

@@ -1,6 +1,7 @@
 // The manual as a page for man(1) and as one for the documentation.
 
 #include "Tools/zulm/Manual.h"
+#include "Tools/zulm/Substitutes.h"
 
 #include <fmt/core.h>
 #include <fmt/ranges.h>
@@ -13,15 +14,7 @@ namespace {
 
 /// As running text of a manual page: nothing in it is a request or an escape.
 std::string roff(const std::string& text) {
-    std::string escaped;
-    for (const char c : text) {
-        if (c == '\\')
-            escaped += "\\e";
-        else if (c == '-')
-            escaped += "\\-";
-        else
-            escaped += c;
-    }
+    const std::string escaped = substituted(text, {{'\\', "\\e"}, {'-', "\\-"}});
     return escaped.starts_with(".") || escaped.starts_with("'") ? "\\&" + escaped : escaped;
 }
 
@@ -46,10 +39,7 @@ std::string roffCommand(const ManualCommand& command) {
 
 /// A '|' would divide the cell of a table.
 std::string cell(const std::string& text) {
-    std::string escaped;
-    for (const char c : text)
-        escaped += c == '|' ? "\\|" : std::string(1, c);
-    return escaped;
+    return substituted(text, {{'|', "\\|"}});
 }
 
 std::string markdownOptions(const std::vector<ManualOption>& options) {
@@ -101,7 +91,7 @@ std::string manPage(const Manual& manual) {
     for (const ManualOption& option : manual.options)
         page += roffOption(option);
     page += ".SH EXIT STATUS\n";
-    for (const auto& [code, meaning] : exitCodeMeanings())
+    for (const auto& [code, meaning] : s_exitCodes)
         page += fmt::format(".TP\n.B {}\n{}\n", code, roff(meaning));
     page +=
         ".SH ENVIRONMENT\n.TP\n.B NO_COLOR\nIf this is set and not empty, nothing is coloured.\n.TP\n.B TERM\nIf this "
@@ -118,7 +108,7 @@ std::string markdownPage(const Manual& manual) {
     page +=
         "\nThis page is generated from the tool's options by `zulm --generate markdown`. [schemas](schemas) has the "
         "schemas of the JSON documents.\n\n## Exit codes\n\n| code | meaning |\n| --- | --- |\n";
-    for (const auto& [code, meaning] : exitCodeMeanings())
+    for (const auto& [code, meaning] : s_exitCodes)
         page += fmt::format("| {} | {} |\n", code, meaning);
     page += "\n## Options of every command\n" + markdownOptions(manual.options);
     for (const std::string& group : groupsOf(manual))

@@ -4,7 +4,6 @@
 
 #include "ZULMetaData/Containers/ContainerType.h"
 
-#include <cstddef>
 #include <cstdint>
 #include <fstream>
 #include <memory>
@@ -16,8 +15,6 @@ namespace Zulm {
 class FileAccess;
 class InputFile;
 class TemporaryFile;
-
-constexpr std::size_t s_copyPieceSize = 1 << 20; ///< in bytes: what is copied at once
 
 /// A file that is written under another name beside its place, then synced and renamed. A file that is not committed
 /// is removed, also when a signal ends the program.

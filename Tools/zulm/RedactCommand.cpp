@@ -16,7 +16,6 @@
 #include <algorithm>
 #include <limits>
 #include <memory>
-#include <optional>
 
 namespace Zulm {
 
@@ -29,12 +28,8 @@ struct RedactOptions {
     std::string output;
     std::vector<std::string> removedKinds;
     std::vector<std::string> keptKinds;
-    bool keys = false;
     std::vector<std::string> titles;
-    std::vector<TimeRange> ranges;
-    bool chapters = false;
-    bool creator = false;
-    bool blankUnknown = false;
+    RecordingRedaction redaction; ///< what the other options say of it
     bool dryRun = false;
     bool force = false;
     bool json = false;
@@ -78,41 +73,31 @@ std::set<uuid> typesNamed(const std::vector<std::string>& kinds) {
 }
 
 RecordingRedaction redactionFor(const RedactOptions& options) {
-    RecordingRedaction redaction;
+    RecordingRedaction redaction = options.redaction;
     redaction.streams.removedKinds = typesNamed(options.removedKinds);
     redaction.streams.keptKinds = typesNamed(options.keptKinds);
-    redaction.streams.clearsKeys = options.keys;
-    redaction.streams.removedTimes = options.ranges;
     if (!options.titles.empty())
         redaction.streams.hidesText =
             [patterns = std::make_shared<std::vector<TextPattern>>(patternsIn(options))](const std::string& text) {
                 return std::any_of(patterns->begin(), patterns->end(),
                                    [valid = validText(text)](const auto& pattern) { return pattern.matches(valid); });
             };
-    redaction.removesChapters = options.chapters;
-    redaction.removesCreator = options.creator;
-    redaction.blanksUnknown = options.blankUnknown;
     redaction.spellings = [](const std::string& text) { return std::vector{composed(text), decomposed(text)}; };
     return redaction;
-}
-
-bool isLoss(const RedactedStream& stream) {
-    return stream.bytesLeftOut > 0 ||
-           (stream.removal != RedactedStream::Kept && stream.removal != RedactedStream::Asked);
 }
 
 ExitCode complainAboutWhatIsLeftOut(const std::string& name, const RedactedRecording& recording) {
     ExitCode code = ExitFine;
     for (const RedactedStream& stream : recording.streams) {
-        if (!isLoss(stream))
-            continue;
-        code = ExitDamaged;
+        std::string loss;
         if (stream.bytesLeftOut > 0)
-            complain(fmt::format("{}: {}: left out {} bytes after its last whole entry", name,
-                                 metaDataKindName(stream.header.uuid), stream.bytesLeftOut));
-        else
-            complain(
-                fmt::format("{}: {}: {}", name, metaDataKindName(stream.header.uuid), removalText(stream.removal)));
+            loss = fmt::format("left out {} bytes after its last whole entry", stream.bytesLeftOut);
+        else if (stream.removal != RedactedStream::Kept && stream.removal != RedactedStream::Asked)
+            loss = removalText(stream.removal);
+        if (loss.empty())
+            continue;
+        complain(fmt::format("{}: {}: {}", name, metaDataKindName(stream.header.uuid), loss));
+        code = ExitDamaged;
     }
     if (recording.unreachableStreams == 0)
         return code;
@@ -151,8 +136,9 @@ std::string hintFor(RedactionError::Reason reason, const std::string& name) {
 
 /// Throws `Failure` in place of what the library throws, and names the file that is concerned.
 template <class Work>
-auto orFailure(const RedactOptions& options, const std::string& name, Work work) {
+auto orFailure(const RedactOptions& options, Work work) {
     using Reason = RedactionError::Reason;
+    const std::string& name = options.file;
     try {
         return orFileError(name, work);
     } catch (const RedactionError& error) {
@@ -163,23 +149,22 @@ auto orFailure(const RedactOptions& options, const std::string& name, Work work)
 }
 
 /// One line of progress for each step.
-RecordingRedactor::Progress progressOf(const RedactOptions& options, const std::string& name) {
+RecordingRedactor::Progress progressOf(const RedactOptions& options) {
     using Step = RecordingRedactor::Step;
     struct Shown {
         Step step;
         Progress progress;
     };
-    return
-        [options, name, shown = std::shared_ptr<Shown>()](Step step, std::uint64_t done, std::uint64_t total) mutable {
-            if (!shown || shown->step != step) {
-                shown.reset(); // ends the line of the step before
-                const std::string what = step == Step::Searching ? "searching " + name
-                                         : step == Step::Copying ? "copying " + name
-                                                                 : "checking " + options.output;
-                shown.reset(new Shown{step, {what, total}});
-            }
-            shown->progress.moveTo(done);
-        };
+    return [&options, shown = std::shared_ptr<Shown>()](Step step, std::uint64_t done, std::uint64_t total) mutable {
+        if (!shown || shown->step != step) {
+            shown.reset(); // ends the line of the step before
+            const std::string what = step == Step::Searching ? "searching " + options.file
+                                     : step == Step::Copying ? "copying " + options.file
+                                                             : "checking " + options.output;
+            shown.reset(new Shown{step, {what, total}});
+        }
+        shown->progress.moveTo(done);
+    };
 }
 
 /// The list of a dry run is a result, which --quiet does not hide.
@@ -191,67 +176,52 @@ void tell(const RedactOptions& options, const RedactReport& redaction, const Vis
         printRedaction(redaction, visitEntries);
 }
 
-ExitCode preview(const RedactOptions& options, Recording& recording, RunReport& report) {
-    const std::string& name = recording.name();
+ExitCode preview(const RedactOptions& options, RecordingRedactor& redactor,
+                 std::function<void(const RedactedEntry&)>& visit, RunReport& report) {
+    const RedactedRecording result = redactor.preview();
+    const auto visitEntries = [&](const auto& visitEntry) {
+        visit = visitEntry;
+        redactor.preview();
+    };
+    tell(options, {options.file, {}, result}, visitEntries, report);
+    return complainAboutWhatIsLeftOut(options.file, result);
+}
+
+ExitCode write(const RedactOptions& options, RecordingRedactor& redactor, RunReport& report) {
+    OutputFile output(options.output, {options.file}, options.force);
+    const RedactedRecording result = redactor.write(output.temporaryPath());
+    const ExitCode damage = complainAboutDamage(output.temporaryPath(), options.output);
+    output.commit();
+    tell(options, {options.file, options.output, result}, {}, report);
+    return worseOf(damage, complainAboutWhatIsLeftOut(options.file, result));
+}
+
+ExitCode redact(const RedactOptions& options, RunReport& report) {
+    const InputFile input(options.file);
+    Recording recording = input.open();
+    if (!options.dryRun)
+        requireOutputName(options.output, recording.container(), input.path());
     RecordingRedaction redaction = redactionFor(options);
     std::function<void(const RedactedEntry&)> visit;
-    redaction.streams.onEntry = [&visit](const RedactedEntry& entry) {
-        if (visit)
-            visit(entry);
-    };
-    return orFailure(options, name, [&] {
-        RecordingRedactor redactor(recording.parser().getStream(), recording.container(), redaction,
-                                   progressOf(options, name));
-        if (redactor.isEmpty())
-            return complainAboutNothing(recording, {});
-        const RedactedRecording result = redactor.preview();
-        const auto visitEntries = [&](const auto& visitEntry) {
-            visit = visitEntry;
-            redactor.preview();
+    if (options.dryRun)
+        redaction.streams.onEntry = [&visit](const RedactedEntry& entry) {
+            if (visit)
+                visit(entry);
         };
-        tell(options, {options.file, {}, result}, visitEntries, report);
-        return complainAboutWhatIsLeftOut(name, result);
-    });
-}
-
-ExitCode write(const RedactOptions& options, Recording& recording, RunReport& report) {
-    const std::string& name = recording.name();
-    return orFailure(options, name, [&] {
-        RecordingRedactor redactor(recording.parser().getStream(), recording.container(), redactionFor(options),
-                                   progressOf(options, name));
+    return orFailure(options, [&] {
+        RecordingRedactor redactor(recording.parser().getStream(), recording.container(), redaction,
+                                   progressOf(options));
         if (redactor.isEmpty())
             return complainAboutNothing(recording, {});
-        OutputFile output(options.output, {name}, options.force);
-        const RedactedRecording result = redactor.write(output.temporaryPath());
-        const ExitCode damage = complainAboutDamage(output.temporaryPath(), options.output);
-        output.commit();
-        tell(options, {options.file, options.output, result}, {}, report);
-        return worseOf(damage, complainAboutWhatIsLeftOut(name, result));
-    });
-}
-
-ExitCode runRedact(const RedactOptions& options) {
-    return withReport("redact", options.json, {options.file, options.output}, [&](RunReport& report) {
-        const InputFile input(options.file);
-        Recording recording = input.open();
-        if (options.dryRun)
-            return preview(options, recording, report);
-        requireOutputName(options.output, recording.container(), input.path());
-        return write(options, recording, report);
+        return options.dryRun ? preview(options, redactor, visit, report) : write(options, redactor, report);
     });
 }
 
 bool removesNothing(const RedactOptions& options) {
-    return options.removedKinds.empty() && options.keptKinds.empty() && !options.keys && options.titles.empty() &&
-           options.ranges.empty() && !options.chapters && !options.creator && !options.blankUnknown;
-}
-
-void addPlaceOptions(CLI::App& command, RedactOptions& options) {
-    command.add_flag("--chapters", options.chapters,
-                     "Remove chapters, titles, tags and names of tracks from the movie itself. Captions stay");
-    command.add_flag("--creator", options.creator, "Remove the versions of program and system from the recording info");
-    command.add_flag("--blank-unknown", options.blankUnknown,
-                     "Fill free space, and atoms or chunks of unknown types, with zeros");
+    const RecordingRedaction& redaction = options.redaction;
+    return options.removedKinds.empty() && options.keptKinds.empty() && options.titles.empty() &&
+           !redaction.streams.clearsKeys && redaction.streams.removedTimes.empty() && !redaction.removesChapters &&
+           !redaction.removesCreator && !redaction.blanksUnknown;
 }
 
 } // namespace
@@ -265,7 +235,7 @@ void addRedactCommand(CLI::App& app, Action& chosen) {
     command->add_option("-o,--output", options->output, "The copy, of the same container")->type_name("OUT");
     addStreamOption(*command, options->removedKinds, "Remove this kind, such as cpuUsage, or UUID (repeatable)");
     addStreamOption(*command, options->keptKinds, "Remove all kinds except this one (repeatable)", "--keep-only");
-    command->add_flag("--keys", options->keys,
+    command->add_flag("--keys", options->redaction.streams.clearsKeys,
                       "Make every keystroke character code 0 without modifiers; their times stay");
     command
         ->add_option("--titles", options->titles,
@@ -278,14 +248,19 @@ void addRedactCommand(CLI::App& app, Action& chosen) {
             "--range",
             [options](const std::vector<std::string>& texts) {
                 for (const std::string& text : texts)
-                    options->ranges.push_back(rangeIn(text));
+                    options->redaction.streams.removedTimes.push_back(rangeIn(text));
             },
             "Remove the entries of all streams from A to B seconds; A or B may be missing, and A..B takes time codes. "
             "A "
             "text that holds inside is hidden wherever it is recorded (repeatable)")
         ->type_name("A:B")
         ->allow_extra_args(false);
-    addPlaceOptions(*command, *options);
+    command->add_flag("--chapters", options->redaction.removesChapters,
+                      "Remove chapters, titles, tags and names of tracks from the movie itself. Captions stay");
+    command->add_flag("--creator", options->redaction.removesCreator,
+                      "Remove the versions of program and system from the recording info");
+    command->add_flag("--blank-unknown", options->redaction.blanksUnknown,
+                      "Fill free space, and atoms or chunks of unknown types, with zeros");
     command->add_flag("--dry-run", options->dryRun, "Write nothing; list every entry and place that would go");
     command->add_flag("--force", options->force, "Replace OUT if it exists");
     command->add_flag("--json", options->json, "Print one JSON document");
@@ -298,7 +273,8 @@ void addRedactCommand(CLI::App& app, Action& chosen) {
         if (options->output.empty() && !options->dryRun)
             throw CLI::RequiredError("--output or --dry-run");
         patternsIn(*options);
-        chosen = [options] { return runRedact(*options); };
+        chosen = reporting("redact", options->json, {options->file, options->output},
+                           [options](RunReport& report) { return redact(*options, report); });
     });
 }
 

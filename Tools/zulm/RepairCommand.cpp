@@ -74,11 +74,6 @@ ExitCode repairMovie(const RepairOptions& options, RunReport& report) {
     return worseOf(complainAboutLoss(options.save.movie, repair.plan), isStillDamaged ? ExitDamaged : ExitFine);
 }
 
-ExitCode runRepair(const RepairOptions& options) {
-    return withReport("repair", options.json, {options.save.movie, options.save.output},
-                      [&](RunReport& report) { return repairMovie(options, report); });
-}
-
 } // namespace
 
 void addRepairCommand(CLI::App& app, Action& chosen) {
@@ -95,7 +90,8 @@ void addRepairCommand(CLI::App& app, Action& chosen) {
     command->callback([options, &chosen] {
         if (!options->dryRun)
             requireDestination(options->save);
-        chosen = [options] { return runRepair(*options); };
+        chosen = reporting("repair", options->json, {options->save.movie, options->save.output},
+                           [options](RunReport& report) { return repairMovie(*options, report); });
     });
 }
 

@@ -27,6 +27,12 @@ RunReport::~RunReport() {
     s_current = nullptr;
 }
 
+JsonWriter& RunReport::beginFile(const std::string& name) {
+    writer_.beginObject();
+    writer_.members(fileHeader(name));
+    return writer_;
+}
+
 void RunReport::workOn(const std::string& file) {
     if (isWanted_)
         writer_.endTo(s_filesDepth);
@@ -57,12 +63,21 @@ void RunReport::end() {
     }
 }
 
-ExitCode withReport(const std::string& command, bool isWanted, const std::vector<std::string>& files,
-                    const std::function<ExitCode(RunReport& report)>& work, JsonWriter::Style style) {
-    RunReport report(command, isWanted, files, style);
-    const ExitCode code = orComplaint([&] { return work(report); });
-    report.end();
-    return code;
+Action reporting(const std::string& command, bool isWanted, const std::vector<std::string>& files,
+                 const std::function<ExitCode(RunReport& report)>& work, JsonWriter::Style style) {
+    return [=] {
+        RunReport report(command, isWanted, files, style);
+        const ExitCode code = orComplaint([&] { return work(report); });
+        report.end();
+        return code;
+    };
+}
+
+Action reportingOnEach(const std::string& command, bool isWanted, const std::vector<std::string>& files,
+                       const std::function<ExitCode(const std::string& file, RunReport& report)>& work) {
+    return reporting(command, isWanted, files, [=](RunReport& report) {
+        return forEachFile(files, [&](const std::string& file) { return work(file, report); });
+    });
 }
 
 } // namespace Zulm

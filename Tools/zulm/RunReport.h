@@ -27,7 +27,10 @@ public:
     /// Adds the object of a file. Only for a report that is wanted.
     void add(const nlohmann::ordered_json& file) { writer_.element(file); }
 
-    /// For the object of a file that is written in pieces. Only for a report that is wanted.
+    /// Begins the object of the file `name`, which is written in pieces. Only for a report that is wanted.
+    JsonWriter& beginFile(const std::string& name);
+
+    /// For what is written in pieces. Only for a report that is wanted.
     JsonWriter& writer() { return writer_; }
 
     /// Ends what is open of the object of the file before this one.
@@ -55,10 +58,14 @@ private:
     JsonWriter writer_;
 };
 
-/// Runs `work` with the report of `command`. Whatever goes wrong with it is complained of, and the document is whole
-/// all the same. Throws only if standard output cannot be written.
-ExitCode withReport(const std::string& command, bool isWanted, const std::vector<std::string>& files,
-                    const std::function<ExitCode(RunReport& report)>& work,
-                    JsonWriter::Style style = JsonWriter::Style::Indented);
+/// Returns an action that runs `work` with the report of `command`. Whatever goes wrong with it is complained of, and
+/// the document is whole all the same. The action throws only if standard output cannot be written.
+Action reporting(const std::string& command, bool isWanted, const std::vector<std::string>& files,
+                 const std::function<ExitCode(RunReport& report)>& work,
+                 JsonWriter::Style style = JsonWriter::Style::Indented);
+
+/// The same for `work` on one file after the other, as `forEachFile` runs it.
+Action reportingOnEach(const std::string& command, bool isWanted, const std::vector<std::string>& files,
+                       const std::function<ExitCode(const std::string& file, RunReport& report)>& work);
 
 } // namespace Zulm

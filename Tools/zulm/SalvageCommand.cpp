@@ -80,13 +80,6 @@ bool isWhole(const SalvagedStream& stream) {
     return stream.origin == SalvagedStream::Reachable && !stream.isCutShort;
 }
 
-void beginFile(JsonWriter& writer, const std::string& name, bool isComplete) {
-    writer.beginObject();
-    writer.members(fileHeader(name));
-    writer.member("complete", isComplete);
-    writer.beginArray("streams");
-}
-
 ExitCode salvage(const SalvageOptions& options, RunReport& report) {
     const InputFile input(options.file);
     const SalvageReport found = search(input.path());
@@ -97,8 +90,10 @@ ExitCode salvage(const SalvageOptions& options, RunReport& report) {
     createFolder(options.folder);
     const std::vector<std::string> outputs = outputsFor(found.streams, options.folder);
     requireFree(outputs, options.force);
-    if (report.isWanted())
-        beginFile(report.writer(), input.name(), !found.hasMore);
+    if (report.isWanted()) {
+        report.beginFile(input.name()).member("complete", !found.hasMore);
+        report.writer().beginArray("streams");
+    }
     ExitCode worst = found.hasMore ? ExitDamaged : ExitFine;
     for (std::size_t i = 0; i < outputs.size(); ++i) {
         const SalvagedStream& stream = found.streams[i];
@@ -113,11 +108,6 @@ ExitCode salvage(const SalvageOptions& options, RunReport& report) {
         complain(fmt::format("{}: has more than {} places that look like streams; the rest was not looked into",
                              input.name(), SalvageReport::s_maximumStreams));
     return worst;
-}
-
-ExitCode runSalvage(const SalvageOptions& options) {
-    return withReport("salvage", options.json, {options.file},
-                      [&](RunReport& report) { return salvage(options, report); });
 }
 
 } // namespace
@@ -139,7 +129,10 @@ void addSalvageCommand(CLI::App& app, Action& chosen) {
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm salvage Broken.mp4 -o rescued\n"
                     "zulm salvage Broken.mp4 -o rescued && zulm attach Copy.mp4 rescued/*.dat -o Whole.mp4");
-    command->callback([options, &chosen] { chosen = [options] { return runSalvage(*options); }; });
+    command->callback([options, &chosen] {
+        chosen = reporting("salvage", options->json, {options->file},
+                           [options](RunReport& report) { return salvage(*options, report); });
+    });
 }
 
 } // namespace Zulm

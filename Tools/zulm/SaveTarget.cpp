@@ -26,15 +26,6 @@ extern "C" void noteSignal(int signal) {
     s_caught = signal;
 }
 
-void catchSignals() {
-    s_caught = 0;
-    handleEndingSignals(noteSignal);
-}
-
-void releaseSignals() {
-    handleEndingSignals(SIG_DFL);
-}
-
 std::string hexText(const std::string& bytes) {
     std::string text;
     for (const char byte : bytes)
@@ -86,7 +77,8 @@ SaveTarget::SaveTarget(const SaveOptions& options, const std::vector<std::string
         requireFile(options.movie, true);
     requireRepairable(movie_, options.movie);
     if (options.inPlace) {
-        catchSignals();
+        s_caught = 0;
+        handleEndingSignals(noteSignal);
         return;
     }
     std::vector<std::string> inputs = otherInputs;
@@ -96,7 +88,7 @@ SaveTarget::SaveTarget(const SaveOptions& options, const std::vector<std::string
 
 SaveTarget::~SaveTarget() {
     if (!copy_)
-        releaseSignals();
+        handleEndingSignals(SIG_DFL);
 }
 
 SafeMovieSave::Progress SaveTarget::progress(const std::string& what) const {
@@ -143,9 +135,10 @@ void SaveTarget::endBy(const Interruption& interruption) const {
     throw Failure(fmt::format("{}: interrupted", name_));
 }
 
-void addFragmentIndexOption(CLI::App& command, bool& isMoved) {
-    command.add_flag("--move-mfra", isMoved,
-                     "Copy the index of a fragmented movie (mfra) to the end of the file, where players look for it");
+void addFragmentIndexOption(CLI::App& command, SafeMovieSave::FragmentIndex& index) {
+    command.add_flag_callback(
+        "--move-mfra", [&index] { index = SafeMovieSave::FragmentIndex::MoveToEnd; },
+        "Copy the index of a fragmented movie (mfra) to the end of the file, where players look for it");
 }
 
 std::string fragmentIndexText(FragmentIndexState state) {

@@ -95,7 +95,7 @@ private:
 };
 
 /// Adds --move-mfra.
-void addFragmentIndexOption(CLI::App& command, bool& isMoved);
+void addFragmentIndexOption(CLI::App& command, ZULMetaData::SafeMovieSave::FragmentIndex& index);
 
 /// "none", "not-at-end" or "at-end".
 std::string fragmentIndexText(ZULMetaData::FragmentIndexState state);

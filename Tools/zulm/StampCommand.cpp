@@ -18,7 +18,7 @@ struct StampOptions {
     SaveOptions save;
     std::string creator;
     std::string version;
-    bool movesIndex = false;
+    SafeMovieSave::FragmentIndex index = SafeMovieSave::FragmentIndex::Leave;
     bool json = false;
 };
 
@@ -50,9 +50,7 @@ ExitCode complainAboutCut(const StampOptions& options, const CreatorAttributes& 
 ExitCode stampMovie(const StampOptions& options, RunReport& report) {
     SaveTarget movie(options.save, {});
     const StampResult stamped = movie.save("stamping " + movie.name(), [&](const SafeMovieSave& save) {
-        return save.stamp(options.creator, options.version,
-                          options.movesIndex ? SafeMovieSave::FragmentIndex::MoveToEnd
-                                             : SafeMovieSave::FragmentIndex::Leave);
+        return save.stamp(options.creator, options.version, options.index);
     });
     if (report.isWanted())
         report.add(fileDocument(options, movie.name(), stamped));
@@ -60,11 +58,6 @@ ExitCode stampMovie(const StampOptions& options, RunReport& report) {
         print(options, movie.name(), stamped);
     warnOfFragmentIndex(movie.name(), stamped.fragmentIndex);
     return worseOf(complainAboutLoss(movie.name(), stamped.repair), complainAboutCut(options, stamped.info.creator));
-}
-
-ExitCode runStamp(const StampOptions& options) {
-    return withReport("stamp", options.json, {options.save.movie, options.save.output},
-                      [&](RunReport& report) { return stampMovie(options, report); });
 }
 
 } // namespace
@@ -85,12 +78,13 @@ void addStampCommand(CLI::App& app, Action& chosen) {
                      "The version of the creator, at most 15 bytes; it is stored")
         ->required()
         ->type_name("V");
-    addFragmentIndexOption(*command, options->movesIndex);
+    addFragmentIndexOption(*command, options->index);
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm stamp Movie.mp4 --creator Recorder --creator-version 4.2 --in-place");
     command->callback([options, &chosen] {
         requireDestination(options->save);
-        chosen = [options] { return runStamp(*options); };
+        chosen = reporting("stamp", options->json, {options->save.movie, options->save.output},
+                           [options](RunReport& report) { return stampMovie(*options, report); });
     });
 }
 

@@ -29,20 +29,12 @@ struct VerifyOptions {
     bool json = false;
 };
 
-std::vector<std::string> ruleNames() {
-    std::vector<std::string> names;
-    names.reserve(s_findingRules.size());
-    for (const FindingRule& rule : s_findingRules)
-        names.emplace_back(rule.name);
-    return names;
-}
-
 FindingCode ruleNamed(const std::string& name) {
     const auto found = std::find_if(s_findingRules.begin(), s_findingRules.end(),
                                     [&](const FindingRule& rule) { return rule.name == name; });
     if (found == s_findingRules.end())
         throw CLI::ValidationError("--ignore", fmt::format("{} is no rule{}; 'zulm verify --rules' lists them all",
-                                                           name, suggestionFor(name, ruleNames())));
+                                                           name, suggestionFor(name, namesIn(s_findingRules))));
     return found->code;
 }
 
@@ -116,14 +108,6 @@ ExitCode verify(const VerifyOptions& options, const std::string& path, RunReport
     return code;
 }
 
-ExitCode runVerify(const VerifyOptions& options) {
-    if (options.listsRules)
-        return listRules();
-    return withReport("verify", options.json, options.files, [&](RunReport& report) {
-        return forEachFile(options.files, [&](const std::string& path) { return verify(options, path, report); });
-    });
-}
-
 } // namespace
 
 void addVerifyCommand(CLI::App& app, Action& chosen) {
@@ -148,7 +132,12 @@ void addVerifyCommand(CLI::App& app, Action& chosen) {
     command->callback([options, &chosen] {
         if (options->files.empty() && !options->listsRules)
             throw CLI::RequiredError("FILE");
-        chosen = [options] { return runVerify(*options); };
+        if (options->listsRules)
+            chosen = listRules;
+        else
+            chosen = reportingOnEach(
+                "verify", options->json, options->files,
+                [options](const std::string& path, RunReport& report) { return verify(*options, path, report); });
     });
 }
 

@@ -1,4 +1,3 @@
-#include "Reports/Layout.h"
 #include "Reports/Text.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/Command.h"

@@ -2,8 +2,8 @@
 
 #include "Reports/Findings.h"
 #include "Reports/InfoReport.h"
-#include "Reports/Report.h"
 #include "Reports/Text.h"
+#include "Tools/zulm/Substitutes.h"
 #include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 
 #include <fmt/core.h>
@@ -49,10 +49,7 @@ std::string embeddedAddress(const Recording& recording) {
 }
 
 std::string scriptText(const Json& document) {
-    std::string text;
-    for (const char c : jsonLine(document))
-        text += c == '<' ? std::string("\\u003c") : std::string(1, c);
-    return text;
+    return substituted(jsonLine(document), {{'<', "\\u003c"}});
 }
 
 } // namespace Zulm
