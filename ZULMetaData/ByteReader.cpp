@@ -1,7 +1,7 @@
 #include "ZULMetaData/ByteReader.h"
 
 #include <algorithm>
-#include <limits>
+#include <utility>
 
 namespace ZULMetaData::detail {
 
@@ -22,11 +22,12 @@ std::string_view ByteReader::refilled(std::uint64_t position, std::uint64_t size
     if (position < windowStart_ || position > windowEnd || wanted > windowEnd - position) {
         blockSize_ = isNext ? std::min(2 * blockSize_, s_largestBlock) : s_smallestBlock;
         const auto count = static_cast<std::size_t>(std::min(std::max<std::uint64_t>(wanted, blockSize_), left));
-        if (window_.capacity() > 2 * s_largestBlock && count <= s_largestBlock)
-            window_ = {}; // a single large piece does not keep its memory
-        window_.resize(count);
-        windowStart_ = std::numeric_limits<std::uint64_t>::max(); // the window stays empty if reading fails
-        window_.resize(source_.read(position, window_));
+        std::vector<char> window = std::exchange(window_, {}); // it stays empty if reading fails
+        if (window.capacity() > 2 * s_largestBlock && count <= s_largestBlock)
+            window = {}; // a single large piece does not keep its memory
+        window.resize(count);
+        window.resize(source_.read(position, window));
+        window_ = std::move(window);
         windowStart_ = position;
     }
     const auto start = static_cast<std::size_t>(position - windowStart_);

@@ -42,7 +42,8 @@ public:
     /// Returns all bytes from `position` on that are in memory: at least one, except at the end.
     std::string_view from(std::uint64_t position) {
         const std::string_view first = at(position, 1);
-        return first.empty() ? first : std::string_view(first.data(), window_.data() + window_.size());
+        const auto size = window_.data() + window_.size() - first.data();
+        return first.empty() ? first : std::string_view(first.data(), static_cast<std::size_t>(size));
     }
 
     /// Returns the number that is stored at `position` as this processor stores it. Empty if its bytes do not exist.
