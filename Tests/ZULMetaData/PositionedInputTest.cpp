@@ -1,11 +1,11 @@
 // Movies of nothing but the smallest atoms, some of which end inside their own header: every walk reads each part of
 // the file about once.
 
+#include "ZULMetaData/PositionedInput.h"
 #include "Tests/Support/Bytes.h"
 #include "Tests/Support/Files.h"
 #include "ZULMetaData/Containers/ContainerLayout.h"
 #include "ZULMetaData/Containers/RepairPlan.h"
-#include "ZULMetaData/PositionedInput.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
 #include <gtest/gtest.h>
