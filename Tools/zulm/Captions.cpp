@@ -133,7 +133,8 @@ std::string formatted(std::vector<Caption> captions, CaptionFormat format, std::
     const double unitsPerSecond = format == CaptionFormat::ASS ? 100 : 1000;
     std::string file = headerOf(format);
     std::size_t number = 0;
-    for (const PlacedCaption& caption : placed(std::move(captions), unitsPerSecond, duration))
+    const auto inOrder = placed(std::move(captions), unitsPerSecond, duration);
+    for (const PlacedCaption& caption : inOrder)
         file += item(caption, ++number, format);
     return file;
 }

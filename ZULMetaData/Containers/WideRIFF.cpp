@@ -54,7 +54,7 @@ bool isMetaData(const ItemWalk& chunks, std::uint64_t position) {
     const auto metaData = chunks.itemAt(position);
     const auto stream = chunks.itemAt(position + s_chunkHeaderSize);
     if (!metaData || !stream || !stream->holdsStream() || stream->payloadSize() < s_metaDataHeaderSize ||
-        stream->end() > metaData->end())
+        !stream->fits(metaData->end()))
         return false;
     return leadsToEnd(chunks, chunks.after(*metaData)) ||
            (metaData->end() > chunks.end() && beginsLikeStream(chunks, *stream));
