@@ -198,6 +198,7 @@ std::vector<StreamReport> streamsNamed(const ZulmRecording& opened, const char* 
 
 std::vector<ZulmRecording::Stream> ZulmRecording::summarized(const std::vector<StreamReport>& reports) {
     std::vector<Stream> streams;
+    streams.reserve(reports.size());
     for (const StreamReport& report : reports)
         streams.push_back({report, report.name(), uuidText(report.type), {}});
     for (auto& [report, kind, identifier, summary] : streams) {

@@ -25,6 +25,7 @@ std::string suggestionFor(std::string_view word, const std::vector<std::string>&
 template <class Table>
 std::vector<std::string> namesIn(const Table& table) {
     std::vector<std::string> names;
+    names.reserve(table.size());
     for (const auto& row : table)
         names.emplace_back(row.name);
     return names;

@@ -54,6 +54,7 @@ ExitCode extract(const ExtractOptions& options, RunReport& report) {
         return complainAboutNothing(recording, options.kinds);
     createFolder(options.folder);
     std::vector<std::string> outputs;
+    outputs.reserve(streams.size());
     for (const StreamInfo& stream : streams)
         outputs.push_back(streamFileIn(options.folder, stream.type));
     requireFree(outputs, options.force);

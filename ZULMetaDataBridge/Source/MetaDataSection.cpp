@@ -50,7 +50,7 @@ void MetaDataSection::close(std::uint64_t begin, FourCC type) {
     const auto header = detail::chunkHeader(type, static_cast<std::uint32_t>(size));
     out_.write(header.data(), header.size());
     moveTo(end);
-    out_.write("", size % 2);
+    out_.write("", static_cast<std::streamsize>(size % 2));
 }
 
 void MetaDataSection::finish() {

@@ -159,7 +159,9 @@ private:
             add(FindingCode::EntrySizeMismatch, position, "the header says that entries take ", report_.fixedEntrySize,
                 " bytes, but those of this kind take ", expected, expected == 0 ? " (each carries its own size)" : "",
                 ": they were not read");
-        } else if constexpr (FixedSizeValue<Value>) {
+            return;
+        }
+        if constexpr (FixedSizeValue<Value>) {
             walkFixed();
         } else if constexpr (std::same_as<Value, std::string>) {
             walkSized(s_timeSize, [this](const auto& entry, Fields& fields) {
