@@ -17,7 +17,7 @@ const char* severityText(ZULMetaData::Severity severity);
 std::string findingText(const ZULMetaData::Finding& finding);
 
 /// "at offset 56: the last entry has 4 of 16 bytes (2 more)": the first damage in the stream, and how much else. Empty
-/// if there is none.
+/// if there is none; for a stream of which nothing is readable, says that it could not be examined.
 std::string damageIn(const ZULMetaData::StreamReport& stream);
 
 /// {"code": ..., "severity": "damage" or "notice", "place": ..., "offset": ..., "message": ...}

@@ -26,7 +26,7 @@ LayoutItem entryFor(const ItemWalk& items, const ContainerItem& found, bool isIn
     return entry;
 }
 
-/// Why nothing behind an item can be found; empty where something can.
+/// Returns why the walk ends at this item. Empty if it goes on.
 std::string reasonToEnd(const ItemWalk& items, const LayoutItem& entry, bool isInsideMetaData) {
     const bool isMovie = items.isMovie();
     const std::uint64_t left = items.end() - std::min(entry.item.offset, items.end());

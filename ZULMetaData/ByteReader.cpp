@@ -23,8 +23,10 @@ std::string_view ByteReader::refilled(std::uint64_t position, std::uint64_t size
         blockSize_ = isNext ? std::min(2 * blockSize_, s_largestBlock) : s_smallestBlock;
         const auto count = static_cast<std::size_t>(std::min(std::max<std::uint64_t>(wanted, blockSize_), left));
         std::vector<char> window = std::exchange(window_, {}); // it stays empty if reading fails
-        if (window.capacity() > 2 * s_largestBlock && count <= s_largestBlock)
-            window = {}; // a single large piece does not keep its memory
+        const bool isTooLarge = window.capacity() > 2 * s_largestBlock && count <= s_largestBlock;
+        if (window.capacity() < count ||
+            isTooLarge) // no larger than needed, and a large piece does not keep its memory
+            window = std::vector<char>(count);
         window.resize(count);
         window.resize(source_.read(position, window));
         window_ = std::move(window);

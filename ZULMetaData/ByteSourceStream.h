@@ -13,15 +13,14 @@ namespace ZULMetaData {
 /// the reads follow one another. A source that cannot be read makes the stream bad.
 class ZULMETADATA_API ByteSourceStream final : private std::streambuf, public std::istream {
 public:
-    explicit ByteSourceStream(ByteSource source);
+    explicit ByteSourceStream(ByteSource source); ///< begins at the first byte
 
-protected:
+private:
     std::streambuf::int_type underflow() override;
     std::streambuf::pos_type seekoff(std::streambuf::off_type offset, std::ios_base::seekdir from,
                                      std::ios_base::openmode which) override;
     std::streambuf::pos_type seekpos(std::streambuf::pos_type position, std::ios_base::openmode which) override;
 
-private:
     detail::ByteReader reader_;
     std::uint64_t blockEnd_ = 0; ///< the position in the source after the bytes of the get area
 };

@@ -1,6 +1,6 @@
 #pragma once
 
-// Bytes whose every read may cost a call into another world.
+// A cache for sources whose every read calls JavaScript.
 
 #include "ZULMetaData/ByteSource.h"
 

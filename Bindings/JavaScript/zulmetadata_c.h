@@ -38,7 +38,8 @@ typedef int64_t (*ZulmReadAt)(void* context, uint64_t position, void* bytes, siz
 /* What went wrong in the last call that failed, in words for a person. Valid until the next call that fails. */
 const char* zulm_last_error(void);
 
-/* The extension of `name` tells the container, else the first bytes do. `size` counts all bytes. */
+/* The first bytes say what the recording is; the extension of `name` counts only if they say nothing. `size` counts all
+   bytes. */
 ZulmRecording* zulm_open(ZulmReadAt readAt, void* context, uint64_t size, const char* name);
 void zulm_close(ZulmRecording* recording);
 

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <array>
+#include <bit>
 #include <memory>
 #include <tuple>
 #include <utility>
@@ -14,6 +15,9 @@
 namespace ZULMetaData::Python {
 
 namespace {
+
+// The arrays lie over the bytes of a stream, which are little-endian.
+static_assert(std::endian::native == std::endian::little);
 
 /// Calls `visit` with the key of every stored number of an entry, and a number of its type.
 template <class Kind, class Visit>

@@ -72,7 +72,7 @@ add_test(NAME Consumers/symbols_of_core COMMAND ${CMAKE_COMMAND}
 add_test(NAME Consumers/symbols_of_bridge COMMAND ${CMAKE_COMMAND}
   -DLIBRARY=${libraries}/libZULMetaDataBridge.so -DABI_VERSION=${ZULMETADATA_ABI_VERSION}
   "-DSHOWN=SafeMovieSave::attach;Image::tiffRepresentation;SaveError"
-  "-DHIDDEN=decodePNG;MovieTransaction" -P ${sources}/CheckSymbols.cmake)
+  "-DHIDDEN=decodePNG;MovieFile" -P ${sources}/CheckSymbols.cmake)
 
 set_tests_properties(Consumers/find_package Consumers/examples Consumers/pkg_config Consumers/bridge_finds_core
   Consumers/symbols_of_core Consumers/symbols_of_bridge PROPERTIES FIXTURES_REQUIRED shared_package)

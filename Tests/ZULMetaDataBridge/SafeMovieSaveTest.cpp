@@ -169,7 +169,7 @@ TEST_F(SafeSave, RefusesTwoStreamsOfOneKind) {
     const auto twice = sources({stream("a.dat", locationStream()), stream("b.dat", locationStream())});
     EXPECT_EQ(refusal([&] { SafeMovieSave(movie).attach(twice); }),
               (folder / "b.dat") + ": a second stream of the kind cursorLocation, beside " + (folder / "a.dat"));
-    EXPECT_THAT(refusal([&] { SafeMovieSave(movie).attach(twice, SafeMovieSave::Existing::Supersede); }),
+    EXPECT_THAT(refusal([&] { SafeMovieSave(movie).attach(twice, ExistingStreams::Supersede); }),
                 HasSubstr("a second stream"));
 }
 
@@ -187,7 +187,7 @@ TEST_F(SafeSave, RefusesAKindThatTheMovieHasUnlessItSupersedes) {
     const auto files = sources({stream("a.dat", newer)});
     EXPECT_EQ(refusal([&] { SafeMovieSave(movie).attach(files); }),
               movie + ": has a stream of the kind cursorLocation already, at offset 134");
-    SafeMovieSave(movie).attach(files, SafeMovieSave::Existing::Supersede);
+    SafeMovieSave(movie).attach(files, ExistingStreams::Supersede);
     EXPECT_EQ(streamsInMovie()[kind(s_cursorLocations)], newer);
     EXPECT_EQ(streamsInMovie()[kind(s_appNames)], appNameStream());
 }
@@ -196,6 +196,19 @@ TEST_F(SafeSave, PutsTheRepairBackWhereItRefusesAfterwards) {
     writeFile(movie, media() + be32(1) + "ZULM" + be64(0) + extendedAtom("DATA", locationStream()));
     EXPECT_THAT(refusal([&] { SafeMovieSave(movie).attach(sources({stream("a.dat", locationStream())})); }),
                 HasSubstr("already"));
+}
+
+TEST_F(SafeSave, LooksForStreamsBeforeItOpensTheMovie) {
+    EXPECT_THAT(
+        [&] {
+            try {
+                SafeMovieSave(folder / "missing.mp4").attach(std::vector<StreamSource>{});
+            } catch (const SaveError& error) {
+                return error.sentence();
+            }
+            return std::string();
+        }(),
+        HasSubstr("no streams to attach"));
 }
 
 TEST_F(SafeSave, ChecksWithoutChangingAnything) {
@@ -658,7 +671,7 @@ long peakMemoryInKilobytes() {
 TEST_F(SafeSave, SaysWhereTheIndexOfFragmentsIs) {
     const auto attach = [&](SafeMovieSave::FragmentIndex index) {
         return SafeMovieSave(movie)
-            .attach({StreamSource::memory(locationStream(), "stream")}, SafeMovieSave::Existing::Refuse, index)
+            .attach({StreamSource::memory(locationStream(), "stream")}, ExistingStreams::Refuse, index)
             .fragmentIndex;
     };
     writeFile(movie, media());
@@ -674,7 +687,7 @@ TEST_F(SafeSave, SaysWhereTheIndexOfFragmentsIs) {
 TEST_F(SafeSave, MovesTheIndexOfFragmentsToTheEnd) {
     for (const std::string& index : {atom("mfra", "index"), extendedAtom("mfra", std::string(1 << 19, 'i'))}) {
         writeFile(movie, media() + index);
-        SafeMovieSave(movie).attach({StreamSource::memory(locationStream(), "stream")}, SafeMovieSave::Existing::Refuse,
+        SafeMovieSave(movie).attach({StreamSource::memory(locationStream(), "stream")}, ExistingStreams::Refuse,
                                     SafeMovieSave::FragmentIndex::MoveToEnd);
         std::string blank = index;
         blank.replace(4, 4, "free");
@@ -688,8 +701,7 @@ TEST_F(SafeSave, IsWhatItWasWhereverAMoveOfTheIndexFails) {
     for (const std::uint64_t limit : {whole.size() + 10, whole.size() + 100, whole.size() + 2000}) {
         const FileSizeLimit limited(limit);
         EXPECT_THROW(SafeMovieSave(movie).attach({StreamSource::memory(locationStream(), "stream")},
-                                                 SafeMovieSave::Existing::Refuse,
-                                                 SafeMovieSave::FragmentIndex::MoveToEnd),
+                                                 ExistingStreams::Refuse, SafeMovieSave::FragmentIndex::MoveToEnd),
                      SaveError);
         EXPECT_EQ(contentsOf(movie), whole) << limit;
     }

@@ -300,6 +300,14 @@ TEST(StreamSalvage, SurvivesEveryHostileSize) {
     }
 }
 
+TEST(StreamSalvage, CallsNothingReachableInMetadataWithoutAnEnd) {
+    for (const std::uint64_t size : {~std::uint64_t{0}, ~std::uint64_t{0} - 20}) {
+        const auto streams = salvaged(media() + be32(1) + "ZULM" + be64(size) + extendedAtom("DATA", locationStream()));
+        ASSERT_EQ(streams.size(), 1U);
+        EXPECT_EQ(streams[0].origin, Origin::Unreachable);
+    }
+}
+
 TEST(StreamSalvage, TellsHowFarItIs) {
     std::istringstream file(media() + zulmAtom({locationStream()}));
     std::uint64_t last = 0;

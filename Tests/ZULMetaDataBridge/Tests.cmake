@@ -12,6 +12,7 @@ zulm_add_tests(ZULMetaDataBridgeTests
   MediaFilesTest
   MetaDataExcerptTest
   ParserFamilyTest
+  RecordingCompactionTest
   RecordingRedactionTest
   RecordingTest
   SafeMovieSaveTest

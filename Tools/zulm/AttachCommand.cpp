@@ -42,7 +42,7 @@ struct Streams {
 
 ByteSource openStreamFile(const std::string& path) {
     requireFile(path);
-    ByteSource stream = orFileError(path, [&path] { return ByteSource::file(path); });
+    ByteSource stream = openSource(path, path);
     const RecognizedContainer recognized = recognizeContainer(stream, path);
     if (recognized.type == Container::RawStream)
         return stream;

@@ -35,6 +35,13 @@ std::optional<RetimedStream> appendTo(std::ostream& output, const StreamSource& 
                               source.name(), metaDataKindName(stream.header.uuid)));
 }
 
+/// The place of a stream's copy in the temporary file; empty for what is no stream.
+struct CopiedPart {
+    const StreamSource* original = nullptr;
+    std::uint64_t begin = 0;
+    std::uint64_t size = 0;
+};
+
 } // namespace
 
 void addTimeOptions(CLI::App& command, TimeOptions& options) {
@@ -56,15 +63,15 @@ RetimedSources::RetimedSources(const std::vector<StreamSource>& originals, const
     const Retiming retiming{options.shift.value_or(0), options.trims ? duration : std::nullopt};
     file_ = std::make_unique<TemporaryFile>(folder.empty() ? "." : folder, "streams", ".dat");
     std::ofstream output = openOutput(file_->path(), file_->path());
+    std::vector<CopiedPart> parts;
     for (const StreamSource& original : originals) {
         const auto begin = static_cast<std::uint64_t>(output.tellp());
         const auto stream = appendTo(output, original, retiming);
         const std::uint64_t size = static_cast<std::uint64_t>(output.tellp()) - begin;
         if (!stream) {
-            sources_.push_back(original); // refused in the words of everyone who attaches it
+            parts.push_back({&original}); // refused in the words of everyone who attaches it
             continue;
         }
-        output.flush(); // so that the copy can be opened
         entriesRemoved_ += stream->entriesRemoved;
         if (stream->bytesLeftOut > 0)
             cuts_.push_back(fmt::format("{}: {} left out {} bytes after its last whole entry", original.name(),
@@ -73,12 +80,15 @@ RetimedSources::RetimedSources(const std::vector<StreamSource>& originals, const
             warn(fmt::format("{}: no entry of {} lies in the movie; the stream is left out", original.name(),
                              metaDataKindName(stream->header.uuid)));
         else
-            sources_.push_back(
-                StreamSource::bytes(ByteSource::file(file_->path()).part(begin, size), original.name()).unchecked());
+            parts.push_back({&original, begin, size});
     }
     output.close();
     if (!output)
         throw Failure(fmt::format("{}: cannot be written", file_->path()));
+    const ByteSource copies = openSource(file_->path(), file_->path());
+    for (const auto& [original, begin, size] : parts)
+        sources_.push_back(size == 0 ? *original
+                                     : StreamSource::bytes(copies.part(begin, size), original->name()).unchecked());
 }
 
 RetimedSources::~RetimedSources() = default;

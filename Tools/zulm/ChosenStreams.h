@@ -12,7 +12,7 @@
 
 namespace Zulm {
 
-/// In the order of their identifiers. Only those of `kinds`, where these are given.
+/// Returns the streams in the order of their identifiers. If `kinds` is not empty, returns only those kinds.
 std::vector<ZULMetaData::StreamInfo> chosenStreams(ZULMetaData::Recording& recording,
                                                    const std::vector<std::string>& kinds);
 

@@ -26,10 +26,10 @@ private:
 /// Whether the input is the file at `path`, whatever both are called. The input "-" is standard input.
 bool isInput(const std::string& path, const std::string& input);
 
-/// Creates a folder where there is none. Throws `Failure`.
+/// Creates the folder if it does not exist. Throws `Failure`.
 void createFolder(const std::string& folder);
 
-/// Throws `Failure` where one of the outputs exists, so that nothing is done by halves.
+/// Throws `Failure` if one of the outputs exists, before anything is written.
 void requireFree(const std::vector<std::string>& outputs, bool force);
 
 } // namespace Zulm

@@ -35,7 +35,7 @@ std::string hexText(const std::string& bytes) {
 
 ByteSource openMovie(const std::string& path) {
     requireFile(path);
-    return orFileError(path, [&] { return ByteSource::file(path); });
+    return openSource(path, path);
 }
 
 void requireRepairable(const ByteSource& movie, const std::string& path) {
@@ -78,7 +78,7 @@ SaveTarget::SaveTarget(const SaveOptions& options, const std::vector<std::string
     requireRepairable(movie_, options.movie);
     if (options.inPlace) {
         s_caught = 0;
-        handleEndingSignals(noteSignal);
+        catchSignals();
         return;
     }
     std::vector<std::string> inputs = otherInputs;
@@ -100,6 +100,12 @@ SafeMovieSave::Progress SaveTarget::progress(const std::string& what) const {
             *shown = std::make_unique<Progress>(what, total);
         (*shown)->moveTo(done);
     };
+}
+
+/// A temporary file that was made meanwhile has set handlers of its own, which would end the program in the middle.
+void SaveTarget::catchSignals() const {
+    if (!copy_)
+        handleEndingSignals(noteSignal);
 }
 
 void SaveTarget::makeCopy() {

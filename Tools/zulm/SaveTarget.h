@@ -65,6 +65,7 @@ public:
     auto save(const std::string& what, Work work) {
         try {
             makeCopy();
+            catchSignals();
             const MemoryRunsOutByException undoing;
             auto result = work(ZULMetaData::SafeMovieSave(path_, progress(what)));
             commit();
@@ -83,6 +84,7 @@ private:
 
     ZULMetaData::SafeMovieSave::Progress progress(const std::string& what) const;
     void makeCopy();
+    void catchSignals() const;
     void commit();
     [[noreturn]] void fail(const ZULMetaData::SaveError& error) const;
     [[noreturn]] void endBy(const Interruption& interruption) const;
@@ -110,7 +112,7 @@ std::string unrepairableText(const std::string& path, const ZULMetaData::RepairP
 void printRepair(const std::string& path, const ZULMetaData::RepairPlan& plan);
 nlohmann::ordered_json repairDocument(const ZULMetaData::RepairPlan& plan);
 
-/// Complains where an interrupted append lost something. Gives how the command ends.
+/// Complains if an interrupted append lost something. Returns the exit code.
 ExitCode complainAboutLoss(const std::string& path, const ZULMetaData::RepairPlan& plan);
 
 } // namespace Zulm

@@ -1,5 +1,6 @@
 #include "Tools/zulm/TextPattern.h"
 
+#include "SharedDependencies/UTF8.h"
 #include "Tools/zulm/Expression.h"
 #include "Tools/zulm/NormalForm.h"
 
@@ -17,10 +18,9 @@ std::unique_ptr<Expression, void (*)(Expression*) noexcept> compiled(const std::
 
 /// Where the next character of UTF-8 begins.
 std::size_t afterCharacter(const std::string& text, std::size_t position) {
-    constexpr auto isContinuation = [](char byte) { return (static_cast<unsigned char>(byte) & 0xc0U) == 0x80U; };
     do
         ++position;
-    while (position < text.size() && isContinuation(text[position]));
+    while (position < text.size() && ZULMetaData::continuesCharacter(text[position]));
     return position;
 }
 

@@ -47,8 +47,10 @@ bool readAtomHeader(Input& input, ExtendedSizes sizes, ContainerItem& atom) {
         sizes == ExtendedSizes::Marked ? atom.sizeField == s_extendedSizeMarker : atom.sizeField < s_atomHeaderSize;
     if (!isExtended)
         return true;
-    if (!input.readBigEndian(atom.size))
+    std::uint64_t size = 0;
+    if (!input.readBigEndian(size))
         return atom.sizeField == 0;
+    atom.size = size;
     atom.headerSize = s_extendedAtomHeaderSize;
     return true;
 }

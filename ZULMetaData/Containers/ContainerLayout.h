@@ -31,7 +31,7 @@ enum class ExtendedSizes;
 
 /// An atom of a movie or a chunk of a RIFF file, as its header describes it.
 struct ContainerItem {
-    FourCC type;
+    FourCC type;                  ///< the four characters in the header
     std::uint64_t offset = 0;     ///< the position of the header in the file
     std::uint64_t headerSize = 0; ///< 8, or 16 for an atom in extended form
 

@@ -6,6 +6,7 @@ namespace ZULMetaData {
 
 /// What a file is, as far as finding streams in it is concerned.
 struct Container {
+    /// The types of files.
     enum Type : std::int32_t {
         Unknown,   ///< a file that can hold no streams
         Riff,      ///< chunks, as in AVI and WAV files

@@ -9,14 +9,14 @@ namespace ZULMetaData {
 struct FourCC {
     std::uint32_t value = 0; ///< the first character is the highest byte
 
-    constexpr FourCC() = default;
-    constexpr explicit FourCC(std::uint32_t number) : value(number) {}
-    constexpr FourCC(const char (&characters)[5]) { ///< allows `item.type == "moov"`
+    constexpr FourCC() = default;                                      ///< four zero bytes
+    constexpr explicit FourCC(std::uint32_t number) : value(number) {} ///< the first character is the highest byte
+    constexpr FourCC(const char (&characters)[5]) {                    ///< allows `item.type == "moov"`
         for (int i = 0; i < 4; ++i)
             value = value << 8 | static_cast<unsigned char>(characters[i]);
     }
 
-    friend constexpr bool operator==(FourCC, FourCC) = default;
+    friend constexpr bool operator==(FourCC, FourCC) = default; ///< compares all four characters
 
     /// Returns whether all four are printable characters of ASCII.
     constexpr bool isPrintable() const {

@@ -1,5 +1,6 @@
 #include "ZULMetaDataBridge/Source/KeyCaptions.h"
 
+#include "SharedDependencies/UTF8.h"
 #include "ZULMetaDataBridge/Source/HumanReadableActions.h"
 #include "ZULMetaDataBridge/Source/KeyNames.h"
 
@@ -96,7 +97,8 @@ bool endsLine(const KeyStroke& key) {
 
 /// Returns the number of characters in a UTF-8 text.
 std::size_t lengthOf(const std::string& text) {
-    return static_cast<std::size_t>(std::count_if(text.begin(), text.end(), [](char c) { return (c & 0xc0) != 0x80; }));
+    return static_cast<std::size_t>(
+        std::count_if(text.begin(), text.end(), [](char c) { return !continuesCharacter(c); }));
 }
 
 } // namespace

@@ -49,7 +49,7 @@ inline constexpr std::tuple s_pointFields{Field{"x", &Point::x},
 inline constexpr std::tuple s_rectFields{Field{"x", &Rect::x}, Field{"y", &Rect::y}, Field{"width", &Rect::width},
                                          Field{"height", &Rect::height}};
 
-/// What all kinds have. A kind adds `fields`: the keys of its entries, which "timestamp" follows.
+/// What all kinds have. A kind adds `fields`.
 template <StreamValue T, const uuid& identifier>
 struct StreamKind {
     using Value = T;                                        ///< the type of the values in the stream
@@ -59,7 +59,7 @@ struct StreamKind {
 
 /// Where the window on top was.
 struct TopmostWindowKind : StreamKind<Rect, s_topmostWindowUUID> {
-    static constexpr auto fields = s_rectFields;
+    static constexpr auto fields = s_rectFields; ///< the keys of its entries, which "timestamp" follows
 };
 
 /// What the cursor hovered over.

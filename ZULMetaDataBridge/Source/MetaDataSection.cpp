@@ -38,6 +38,8 @@ std::uint64_t MetaDataSection::open() {
 
 void MetaDataSection::close(std::uint64_t begin, FourCC type) {
     const std::uint64_t end = position();
+    if (!out_)
+        return;
     moveTo(begin);
     if (isMovie_) {
         const auto header = detail::extendedAtomHeader(type, end - begin);
@@ -77,6 +79,19 @@ void appendBytes(const ByteSource& source, std::uint64_t offset, std::uint64_t s
         if (advance)
             advance(bytes.size());
     }
+}
+
+bool haveSameBytes(const ByteSource& left, const ByteSource& right) {
+    constexpr std::size_t pieceSize = 1 << 18;
+    std::string leftPiece(pieceSize, '\0');
+    std::string rightPiece(pieceSize, '\0');
+    bool isSame = left.size() == right.size();
+    for (std::uint64_t position = 0; isSame && position < left.size(); position += pieceSize) {
+        const std::size_t size = left.read(position, leftPiece);
+        isSame = right.read(position, rightPiece) == size && size > 0 &&
+                 std::string_view(leftPiece).substr(0, size) == std::string_view(rightPiece).substr(0, size);
+    }
+    return isSame;
 }
 
 } // namespace ZULMetaData

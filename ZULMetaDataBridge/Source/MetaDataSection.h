@@ -50,4 +50,7 @@ private:
 void appendBytes(const ByteSource& source, std::uint64_t offset, std::uint64_t size, std::ostream& out,
                  const std::function<void(std::uint64_t)>& advance = {});
 
+/// Returns whether two sources hold the same bytes.
+bool haveSameBytes(const ByteSource& left, const ByteSource& right);
+
 } // namespace ZULMetaData

@@ -6,7 +6,6 @@
 #include "ZULMetaData/Containers/RecordingInfo.h"
 
 #include <algorithm>
-#include <span>
 #include <stdexcept>
 #include <utility>
 
@@ -33,13 +32,6 @@ Container::Type recognizedType(const ByteSource& bytes, const std::string& name)
     return recognized.type;
 }
 
-/// Names the file in every error.
-ByteSource named(const ByteSource& bytes, const std::string& name) {
-    return {bytes.size(), [bytes, name](std::uint64_t position, std::span<char> to) {
-                return orFileError(name, [&] { return bytes.read(position, to); });
-            }};
-}
-
 } // namespace
 
 Recording::Recording(const FileLocation& file, std::string name) : Recording(utf8Path(file), std::move(name), {}) {}
@@ -48,7 +40,7 @@ Recording::Recording(ByteSource bytes, std::string name) : Recording({}, std::mo
 
 Recording::Recording(std::string path, std::string name, std::optional<ByteSource> bytes)
     : path_(std::move(path)), name_(name.empty() ? path_ : std::move(name)),
-      bytes_(named(bytes ? *bytes : orFileError(name_, [this] { return ByteSource::file(path_); }), name_)),
+      bytes_(bytes ? namedSource(*bytes, name_) : openSource(path_, name_)),
       input_(std::make_unique<ByteSourceStream>(bytes_)), parser_(opened(name_, [this] {
           return openContainer(*input_, recognizedType(bytes_, path_.empty() ? name_ : path_));
       })) {}

@@ -108,6 +108,7 @@ void RecordingCompaction::complete(const FileLocation& copy) {
     for (const ContainerItem& item : appended_)
         appendBytes(bytesOf(item), 0, item.size, out);
     sizeAfter_ = finishCopy<CompactionError>(out, copy);
+    verify(copy);
 }
 
 /// Metadata before the media leaves its place empty: the media may know the offsets of what follows.
@@ -125,21 +126,40 @@ void RecordingCompaction::blankEarlierMetaData(std::ostream& out) const {
 }
 
 void RecordingCompaction::writeStreams(std::ostream& out) {
-    MetaDataSection section(out, recording_.container());
-    for (const StreamInfo& stream : streams_)
-        section.add([&](std::ostream& output) {
-            const ByteSource bytes = recording_.bytes().part(stream.offset, stream.declaredBytes);
-            const auto extent = measureStream(bytes);
-            const std::uint64_t whole = extent ? extent->wholeBytes : bytes.size();
-            appendBytes(bytes, 0, whole, output);
-            bytesCut_ += stream.declaredBytes - whole;
-            return true;
-        });
     try {
+        MetaDataSection section(out, recording_.container());
+        for (const StreamInfo& stream : streams_)
+            section.add([&](std::ostream& output) {
+                const ByteSource whole = wholePartOf(stream);
+                appendBytes(whole, 0, whole.size(), output);
+                bytesCut_ += stream.declaredBytes - whole.size();
+                return true;
+            });
         section.finish();
     } catch (const std::length_error& error) {
         throw CompactionError(Obstacle::TooLarge, error.what());
     }
+}
+
+/// Returns the stream without an entry that is incomplete at its end.
+ByteSource RecordingCompaction::wholePartOf(const StreamInfo& stream) const {
+    const ByteSource bytes = recording_.bytesOf(stream);
+    const auto extent = measureStream(bytes);
+    const bool isTorn = extent && extent->end == StreamExtent::InsideEntry &&
+                        extent->header.fixedEntrySize == entrySizeOf(extent->header);
+    return isTorn ? bytes.part(0, extent->wholeBytes) : bytes;
+}
+
+/// Reads the copy back: its readers must find the same streams with the same bytes.
+void RecordingCompaction::verify(const FileLocation& copy) const {
+    const Recording written(copy);
+    const std::vector<StreamInfo> found = written.streams();
+    bool isSame = found.size() == streams_.size();
+    for (std::size_t i = 0; isSame && i < found.size(); ++i)
+        isSame = found[i].type == streams_[i].type && !found[i].isCutShort() &&
+                 haveSameBytes(written.bytesOf(found[i]), wholePartOf(streams_[i]));
+    if (!isSame)
+        throw CompactionError(Obstacle::CannotWrite, "does not hold what was written");
 }
 
 } // namespace ZULMetaData

@@ -37,6 +37,7 @@ public:
         CannotWrite,       ///< the copy could not be written
     };
 
+    /// `sentence` does not name the file.
     CompactionError(Reason reason, const std::string& sentence) : std::runtime_error(sentence), reason_(reason) {}
 
     Reason reason() const { return reason_; } ///< tells what can be done
@@ -55,7 +56,8 @@ public:
     /// that it can keep the holes of a sparse file and show its progress.
     std::uint64_t copiedBytes() const;
 
-    /// Writes the rest of the copy. Throws as the constructor does; the copy is unfinished then.
+    /// Writes the rest of the copy and reads its streams back. Throws as the constructor does; the copy is unfinished
+    /// then.
     void complete(const FileLocation& copy);
 
     const std::vector<StreamInfo>& streams() const { return streams_; } ///< returns those in the copy
@@ -72,6 +74,8 @@ private:
     ByteSource bytesOf(const ContainerItem& item) const { return recording_.bytes().part(item.offset, item.size); }
     void blankEarlierMetaData(std::ostream& out) const;
     void writeStreams(std::ostream& out);
+    ByteSource wholePartOf(const StreamInfo& stream) const;
+    void verify(const FileLocation& copy) const;
 
     Recording& recording_;
     KeptMetaData kept_;

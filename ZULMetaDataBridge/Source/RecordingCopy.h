@@ -15,7 +15,7 @@
 namespace ZULMetaData {
 
 template <class Error>
-[[noreturn]] void failToWrite(const std::error_code& error = {errno, std::generic_category()}) {
+[[noreturn]] void failToWrite(const std::error_code& error = {errno != 0 ? errno : EIO, std::generic_category()}) {
     throw Error(Error::Reason::CannotWrite, "cannot be written: " + error.message());
 }
 

@@ -5,6 +5,7 @@
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/RecordingInfo.h"
 #include "ZULMetaData/ZULMMetaDataParser.h"
+#include "ZULMetaDataBridge/Source/FileError.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
 #include "ZULMetaDataBridge/Source/MovieFile.h"
 #include "ZULMetaDataBridge/Source/ZULRAtomWriter.h"
@@ -99,6 +100,7 @@ public:
         plan.requireFor(file_.bytes(), name_);
         for (const auto& [stream, bytes] : plan.streams())
             total_ += 2 * stream.bytes; // written, and read back
+        countIndex(index);
         file_.beginAtom(detail::s_metaDataAtom);
         for (const AttachPlan::Stream& stream : plan.streams())
             result.streams.push_back(append(stream));
@@ -113,6 +115,7 @@ public:
 
     StampResult stamp(const ZCAPHeader& info, SafeMovieSave::FragmentIndex index) {
         StampResult result{repair(), {}, FragmentIndexState::Absent};
+        countIndex(index);
         file_.beginAtom(detail::s_recordingInfoAtom);
         file_.append({reinterpret_cast<const char*>(&info), sizeof info});
         file_.endAtom();
@@ -174,12 +177,22 @@ private:
         });
     }
 
-    FragmentIndexState treat(SafeMovieSave::FragmentIndex index) {
+    std::optional<ContainerItem> findIndex() const {
         std::optional<ContainerItem> found;
         ItemWalk atoms(file_.bytes(), Container::QuickTime);
         while (const auto atom = atoms.next())
             if (atom->type == detail::s_fragmentIndexAtom)
                 found = atom;
+        return found;
+    }
+
+    void countIndex(SafeMovieSave::FragmentIndex index) {
+        if (const auto moved = index == SafeMovieSave::FragmentIndex::MoveToEnd ? findIndex() : std::nullopt)
+            total_ += moved->size;
+    }
+
+    FragmentIndexState treat(SafeMovieSave::FragmentIndex index) {
+        const auto found = findIndex();
         if (!found)
             return FragmentIndexState::Absent;
         if (index == SafeMovieSave::FragmentIndex::Leave)
@@ -192,7 +205,6 @@ private:
     /// both are good.
     void moveToEnd(const ContainerItem& index) {
         const std::uint64_t start = file_.end();
-        total_ += index.size;
         const ByteSource old = file_.bytes().part(index.offset, index.size);
         inPieces(old, index.size, name_, [&](std::uint64_t position, std::span<char> piece) {
             if (position == 0) // open-ended until it is whole
@@ -241,6 +253,8 @@ template <class Work>
 auto naming(const std::string& name, Work work) {
     try {
         return work();
+    } catch (const FileError& error) {
+        throw SaveError(error.file(), error.sentence());
     } catch (const std::system_error& error) {
         throw SaveError(name, error.what());
     }
@@ -272,14 +286,18 @@ AttachPlan::AttachPlan(const std::vector<StreamSource>& streams, ExistingStreams
     }
 }
 
-void AttachPlan::requireFor(const ByteSource& movie, const std::string& name) const {
+void AttachPlan::requireStreams(const std::string& name) const {
     if (streams_.empty())
         throw SaveError(name, "there are no streams to attach");
+}
+
+void AttachPlan::requireFor(const ByteSource& movie, const std::string& name) const {
+    requireStreams(name);
     if (existing_ == ExistingStreams::Supersede)
         return;
-    const FoundStreams found(movie);
+    const auto found = naming(name, [&] { return std::make_unique<FoundStreams>(movie); });
     for (const auto& [stream, bytes] : streams_)
-        if (const auto place = found.placeOf(stream.type); place.offset != 0)
+        if (const auto place = found->placeOf(stream.type); place.offset != 0)
             throw SaveError(name,
                             "has a stream of the kind " + metaDataKindName(stream.type) + " already, at offset " +
                                 std::to_string(place.offset),
@@ -299,6 +317,7 @@ RepairPlan SafeMovieSave::repair() const {
 }
 
 AttachResult SafeMovieSave::attach(const AttachPlan& plan, FragmentIndex index) const {
+    plan.requireStreams(utf8Path(movie_));
     return save(movie_, progress_, [&](Save& work) { return work.attach(plan, index); });
 }
 

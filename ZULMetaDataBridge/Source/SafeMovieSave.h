@@ -96,10 +96,13 @@ public:
     /// messages.
     void requireFor(const ByteSource& movie, const std::string& name) const;
 
+    /// Throws `SaveError` if there is no stream.
+    void requireStreams(const std::string& name) const;
+
     /// One stream as it was measured.
     struct Stream {
         AttachedStream stream; ///< without a place in a movie
-        ByteSource bytes;
+        ByteSource bytes;      ///< the source, header included
     };
     const std::vector<Stream>& streams() const { return streams_; } ///< returns them in the order of the sources
 
@@ -114,16 +117,13 @@ ZULMETADATA_API RepairPlan planSave(const ByteSource& movie, const std::string& 
 
 /// Every operation takes the file for what `recognizeContainer` says and throws `SaveError` if it is no movie. It then
 /// repairs the movie as `planRepair` says, and throws `SaveError` if that cannot be done.
-/// What it appends reaches the disk before its size does, and is read back. Where anything fails, the repair included,
-/// the movie becomes byte for byte what it was, and `SaveError` is thrown. Only where even that fails is it not; the
-/// error then says so.
+/// What it appends reaches the disk before its size does, and is read back. If anything fails, the repair included, the
+/// movie becomes byte for byte what it was, and `SaveError` is thrown. If even that fails, the error says so.
 ///
-/// A program that ends in the middle of it leaves an append that was interrupted, which the next operation repairs.
+/// A program that ends during an operation leaves an interrupted append, which the next operation repairs.
 /// The movie is locked against other programs that use this class. Needs about a megabyte, whatever the streams hold.
 class ZULMETADATA_API SafeMovieSave {
 public:
-    using Existing = ExistingStreams;
-
     /// What to do about an index of fragments, which is no longer at the end of the file once something is appended.
     /// Players that use one then take longer to find a time. `MoveToEnd` copies it to the end and turns the old one
     /// into a `free` atom.

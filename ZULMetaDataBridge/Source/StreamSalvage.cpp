@@ -152,7 +152,7 @@ void StreamSalvage::findReachable() {
         return add(0, 0, total_);
     ItemWalk items(file_, type_);
     while (const auto item = items.next()) {
-        if (!item->holdsMetaData() || item->size == 0)
+        if (!item->holdsMetaData() || item->end() <= item->offset) // readers find nothing in an item without an end
             continue;
         ItemWalk children = items.inside(*item);
         while (const auto child = children.next())

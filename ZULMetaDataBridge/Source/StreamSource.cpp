@@ -6,7 +6,7 @@
 namespace ZULMetaData {
 
 StreamSource::StreamSource(std::string name, Callback<ByteSource()> open)
-    : name_(std::move(name)), open_(std::move(open)), opened_(std::make_shared<std::optional<ByteSource>>()) {}
+    : name_(std::move(name)), open_(std::move(open)) {}
 
 StreamSource StreamSource::file(const FileLocation& file) {
     return part(file, 0, std::numeric_limits<std::uint64_t>::max());
@@ -28,12 +28,6 @@ StreamSource StreamSource::unchecked() const {
     StreamSource source = *this;
     source.isChecked_ = false;
     return source;
-}
-
-ByteSource StreamSource::open() const {
-    if (!*opened_)
-        *opened_ = open_();
-    return **opened_;
 }
 
 } // namespace ZULMetaData

@@ -9,15 +9,12 @@
 #include "../../ZULMetaData/ByteSource.h"
 
 #include <cstdint>
-#include <memory>
-#include <optional>
 #include <string>
 #include <string_view>
 
 namespace ZULMetaData {
 
-/// The source of a stream. It opens its file when it is used for the first time, and only once. Copies refer to the
-/// same stream and the same open file.
+/// The source of a stream. It opens its file whenever it is used. Copies refer to the same stream.
 class ZULMETADATA_API StreamSource {
 public:
     /// Returns a source for a whole stream file.
@@ -42,14 +39,13 @@ public:
     bool isChecked() const { return isChecked_; }     ///< returns false after `unchecked`
 
     /// Returns the bytes of the stream, header included. Throws `std::system_error` if its file cannot be opened.
-    ByteSource open() const;
+    ByteSource open() const { return open_(); }
 
 private:
     StreamSource(std::string name, Callback<ByteSource()> open);
 
     std::string name_;
     Callback<ByteSource()> open_;
-    std::shared_ptr<std::optional<ByteSource>> opened_;
     bool isChecked_ = true;
 };
 

@@ -23,7 +23,7 @@ LEFT_OUT = [
     "TextReader.AsksForLittleMoreMemoryThanThereIsInputUntilItEnds",
     "TextReader.WrapsASizeBelowThatOfTheTimeAround",
 ]
-# Tests of pictures that are large and of one colour: minutes for few lines of code, left to the long form.
+# Tests of large pictures of one colour. They take minutes and cover few lines, so only the long form runs them.
 SLOW = [
     "EncodedImageCheck.DoesNotUnpackAGigabyteOfPixels",
     "EncodedImageCheck.DoesNotUnpackALargeTIFFFile",
