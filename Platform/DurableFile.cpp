@@ -53,7 +53,11 @@ std::uint64_t DurableFile::size() const {
 bool DurableFile::isNamed(const FileLocation& file) const {
     struct stat named {};
     const struct stat own = statusOf(number());
-    return stat(file.c_str(), &named) == 0 && named.st_dev == own.st_dev && named.st_ino == own.st_ino;
+    if (stat(file.c_str(), &named) == 0)
+        return named.st_dev == own.st_dev && named.st_ino == own.st_ino;
+    if (errno != ENOENT && errno != ENOTDIR)
+        throwSystemError(errno, "cannot be examined");
+    return false;
 }
 
 void DurableFile::sync() {

@@ -265,10 +265,10 @@ bool markAlphaAsPremultiplied(TIFF* tiff) {
 bool mirrorInsteadOfTurning(TIFF* tiff) {
     constexpr std::array<int, 4> mirrors{ORIENTATION_TOPLEFT, ORIENTATION_BOTLEFT, ORIENTATION_BOTRIGHT,
                                          ORIENTATION_TOPRIGHT}; // instead of LEFTTOP, RIGHTTOP, RIGHTBOT and LEFTBOT
-    const auto turned = std::size_t{field<std::uint16_t>(tiff, TIFFTAG_ORIENTATION)} - ORIENTATION_LEFTTOP;
-    if (turned >= mirrors.size())
+    const std::size_t orientation = field<std::uint16_t>(tiff, TIFFTAG_ORIENTATION);
+    if (orientation < ORIENTATION_LEFTTOP || orientation - ORIENTATION_LEFTTOP >= mirrors.size())
         return false;
-    TIFFSetField(tiff, TIFFTAG_ORIENTATION, mirrors[turned]);
+    TIFFSetField(tiff, TIFFTAG_ORIENTATION, mirrors[orientation - ORIENTATION_LEFTTOP]);
     return true;
 }
 

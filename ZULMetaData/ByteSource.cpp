@@ -41,14 +41,13 @@ ByteSource ByteSource::file(const std::string& path) {
     file->rdbuf()->pubsetbuf(nullptr, 0); // whoever reads small pieces has a buffer of its own
     errno = 0;
     fileOpen(*file, path.c_str(), std::ios_base::binary);
-    std::error_code reason(errno, std::generic_category());
-    std::error_code looking;
-    const bool isFile = std::filesystem::is_regular_file(path, looking);
-    if (!isFile || !file->is_open()) {
-        if (!reason)
-            reason = looking ? looking : std::make_error_code(std::errc::invalid_argument);
-        throw std::system_error(reason, "cannot be opened");
-    }
+    const std::error_code reason(errno, std::generic_category());
+    if (!file->is_open())
+        throw std::system_error(reason ? reason : std::make_error_code(std::errc::io_error), "cannot be opened");
+    std::error_code error;
+    if (!std::filesystem::is_regular_file(path, error))
+        throw std::system_error(error ? error : std::make_error_code(std::errc::invalid_argument),
+                                "is not a regular file");
     return {sizeOf(*file),
             [file](std::uint64_t position, std::span<char> bytes) { return readStream(*file, position, bytes); }};
 }

@@ -5,7 +5,9 @@
 namespace ZULMetaData {
 
 ByteSourceStream::ByteSourceStream(ByteSource source)
-    : std::istream(static_cast<std::streambuf*>(this)), reader_(std::move(source)) {}
+    : std::istream(static_cast<std::streambuf*>(this)), reader_(std::move(source)) {
+    exceptions(std::ios_base::badbit); // passes on what the source throws
+}
 
 std::streambuf::int_type ByteSourceStream::underflow() {
     const std::string_view bytes = reader_.from(blockEnd_);

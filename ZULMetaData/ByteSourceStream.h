@@ -10,7 +10,8 @@
 namespace ZULMetaData {
 
 /// An input stream over a source, for readers that take a stream. Reads small blocks after a seek and larger ones as
-/// the reads follow one another. A source that cannot be read makes the stream bad.
+/// the reads follow one another. What the source throws passes through, and leaves
+/// the stream bad.
 class ZULMETADATA_API ByteSourceStream final : private std::streambuf, public std::istream {
 public:
     explicit ByteSourceStream(ByteSource source); ///< begins at the first byte

@@ -12,6 +12,7 @@ cmake --build --preset release --target zulm reliability_programs >&2
 if [ ! -f build/dev/CMakeCache.txt ]; then # for valgrind, which takes what scripts/test.sh has built
     cmake --preset dev -DZULM_BUILD_VIEWER=OFF -DZULMETADATA_TEST_CONSUMERS=OFF -DZULMETADATA_BUILD_PYTHON=OFF >/dev/null
 fi
+cmake --preset dev -DZULMETADATA_BUILD_TESTS=ON >/dev/null # a build without them may be there
 cmake --build --preset dev >&2
 
 python3 Tests/Reliability/run.py --build build/release "$@"

@@ -10,6 +10,7 @@
 
 #include <array>
 #include <cstddef>
+#include <new>
 #include <sstream>
 #include <stdexcept>
 #include <string>
@@ -105,13 +106,17 @@ TEST(ByteSource, KeepsItsFileOpen) {
 
 TEST(ByteSource, RefusesWhatIsNoFile) {
     const TemporaryFolder folder;
-    for (const std::string& path : {folder / "missing", folder / "."})
+    const auto refusal = [](const std::string& path) {
         try {
             ByteSource::file(path);
-            ADD_FAILURE() << path;
         } catch (const std::system_error& error) {
-            EXPECT_TRUE(std::string(error.what()).starts_with("cannot be opened")) << error.what();
+            return std::string(error.what());
         }
+        return std::string();
+    };
+    EXPECT_EQ(refusal(folder / "missing"), "cannot be opened: No such file or directory");
+    EXPECT_EQ(refusal(folder / "."), "is not a regular file: Invalid argument");
+    EXPECT_EQ(refusal("/dev/null"), "is not a regular file: Invalid argument");
 }
 
 TEST(ByteReader, ReturnsWhatTheSourceHoldsHoweverItIsAskedFor) {
@@ -167,12 +172,15 @@ TEST(ByteSourceStream, IsReadLikeAFile) {
     EXPECT_EQ(stream.tellg(), static_cast<std::streamoff>(bytes.size() - 3));
 }
 
-TEST(ByteSourceStream, BecomesBadIfTheSourceCannotBeRead) {
+TEST(ByteSourceStream, ThrowsWhatTheSourceThrows) {
     ByteSourceStream stream(ByteSource(100, [](std::uint64_t, std::span<char>) -> std::size_t {
         throw std::system_error(std::make_error_code(std::errc::io_error));
     }));
-    stream.get();
+    EXPECT_THROW(stream.get(), std::system_error);
     EXPECT_TRUE(stream.bad());
+    ByteSourceStream scarce(
+        ByteSource(100, [](std::uint64_t, std::span<char>) -> std::size_t { throw std::bad_alloc(); }));
+    EXPECT_THROW(scarce.get(), std::bad_alloc);
 }
 
 } // namespace

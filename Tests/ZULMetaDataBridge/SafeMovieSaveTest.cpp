@@ -241,7 +241,7 @@ TEST_F(SafeSave, RefusesStreamsThatAreNone) {
     EXPECT_THAT(refusal([&] { SafeMovieSave(movie).attach({StreamSource::file(folder / "missing.dat")}); }),
                 HasSubstr("missing.dat: cannot be opened"));
     EXPECT_THAT(refusal([&] { SafeMovieSave(movie).attach({StreamSource::file(folder.path())}); }),
-                HasSubstr("cannot be opened"));
+                HasSubstr("is not a regular file"));
 }
 
 TEST_F(SafeSave, RefusesMoviesThatAreNone) {

@@ -115,12 +115,13 @@ AS_USUAL = dict(write=WROTE, read="11 entries", parse="1 streams", scale="1.0000
                 **{"append-from": "true", "append-memory": "done", "attach-from": "1 attached"})
 CREATED = UNOPENED | dict(write=WROTE, append="true", stamp="done")
 NO_REGULAR_FILE = "throws: {}: is not a regular file"
-EMPTY = UNOPENED | dict(parse="0 streams", validate="throws: begins neither", finalize="true", append="true",
-                        stamp="done", plan="whole", attach=NO_REGULAR_FILE, **{"append-from": "true"})
+NO_SOURCE = "throws: is not a regular file"
+EMPTY = UNOPENED | dict(parse="0 streams", validate=NO_SOURCE, finalize="true", append="true", stamp="done",
+                        plan=NO_REGULAR_FILE, attach=NO_REGULAR_FILE, **{"append-from": "true"})
 LIBRARY = {
     "nothing": CREATED,
-    "folder": UNOPENED | {"parse": "0 streams", "validate": "throws: cannot be read", "append-from": "true",
-                          "plan": "throws: {}: cannot be read"},
+    "folder": UNOPENED | {"parse": "0 streams", "validate": NO_SOURCE, "append-from": "true",
+                          "plan": NO_REGULAR_FILE},
     "pipe": UNOPENED | dict(attach=NO_REGULAR_FILE),
     "link to a pipe": UNOPENED | dict(attach=NO_REGULAR_FILE),
     "device": EMPTY,

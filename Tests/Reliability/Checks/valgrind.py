@@ -37,6 +37,8 @@ PARTS = 4  # into which each test program is divided, so that all workers end at
 def programs(context):
     """The test programs, those of the library alone in the short form."""
     found = sorted((context.build.with_name("dev") / "Tests").glob("*Tests"))
+    if not found:
+        raise RuntimeError("there are no test programs in the build of the dev preset")
     return [program for program in found if context.full or program.name != "ToolsTests"]
 
 
