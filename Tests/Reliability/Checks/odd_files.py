@@ -117,11 +117,11 @@ CREATED = UNOPENED | dict(write=WROTE, append="true", stamp="done")
 NO_REGULAR_FILE = "throws: {}: is not a regular file"
 NO_SOURCE = "throws: is not a regular file"
 EMPTY = UNOPENED | dict(parse="0 streams", validate=NO_SOURCE, finalize="true", append="true", stamp="done",
-                        plan=NO_REGULAR_FILE, attach=NO_REGULAR_FILE, **{"append-from": "true"})
+                        plan=NO_REGULAR_FILE, attach=NO_REGULAR_FILE, **{"append-from": "true", "attach-from": NO_REGULAR_FILE})
 LIBRARY = {
     "nothing": CREATED,
     "folder": UNOPENED | {"parse": "0 streams", "validate": NO_SOURCE, "append-from": "true",
-                          "plan": NO_REGULAR_FILE},
+                          "plan": NO_REGULAR_FILE, "attach-from": NO_REGULAR_FILE},
     "pipe": UNOPENED | dict(attach=NO_REGULAR_FILE),
     "link to a pipe": UNOPENED | dict(attach=NO_REGULAR_FILE),
     "device": EMPTY,
