@@ -73,7 +73,7 @@ std::optional<Image> decodeTIFF(std::span<const std::uint8_t> encoded);
 /// Reads the directory alone. Empty if `decodeTIFF` would refuse the file for it.
 std::optional<EncodedImageInfo> readTIFFInfo(std::span<const std::uint8_t> encoded);
 
-/// Decodes the picture and drops it, if that takes no more than `memory` bytes.
+/// Decodes the picture and drops it, if decoding takes at most `memory` bytes.
 EncodedImageCheck checkTIFF(std::span<const std::uint8_t> encoded, std::uint64_t memory);
 
 /// Little-endian, one uncompressed strip of RGBA with straight alpha. Empty if the image cannot be encoded.

@@ -323,7 +323,7 @@ Image transposed(std::uint32_t width, std::uint32_t height, const std::vector<st
     return {height, width, std::move(turned)};
 }
 
-/// The first picture of a file, of which no more than the directory is read.
+/// The first picture of a file. Only its directory is read.
 struct OpenPicture {
     explicit OpenPicture(std::span<const std::uint8_t> encoded)
         : input{encoded}, tiff(openForReading(input, troubles)), extent(tiff ? extentOf(tiff.get()) : Extent{}),

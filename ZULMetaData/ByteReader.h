@@ -15,7 +15,7 @@
 
 namespace ZULMetaData::detail {
 
-/// Returns the number that is stored in `bytes` at `offset`, where it must be whole.
+/// Returns the number that is stored in `bytes` at `offset`. All of its bytes must exist.
 template <class Number>
 Number numberIn(std::string_view bytes, std::size_t offset) {
     Number number;

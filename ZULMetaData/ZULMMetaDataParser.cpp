@@ -30,7 +30,7 @@ std::string extensionOf(const std::string& path) {
 /// A file that is read through a buffer of its own.
 struct InputFile {
     explicit InputFile(const std::string& path) : buffer(*stream.rdbuf()) {
-        static_cast<std::istream&>(stream).rdbuf(&buffer); // only as such can it be given another buffer
+        static_cast<std::istream&>(stream).rdbuf(&buffer); // only an `std::istream` takes another buffer
         fileOpen(stream, path.c_str(), std::ios_base::in | std::ios_base::binary);
     }
 

@@ -5,7 +5,7 @@ function(zulm_project_options target)
   target_compile_options(${target} PRIVATE
     -Wall -Wextra -Wpedantic -Wconversion -Wsign-conversion -Wshadow -Wold-style-cast
     $<$<BOOL:${ZULMETADATA_WARNINGS_AS_ERRORS}>:-Werror>
-    # GCC 12 takes sums of short strings for copies out of their bounds where it has inlined them.
+    # GCC 12 takes inlined sums of short strings for copies beyond their bounds.
     "$<$<AND:$<CXX_COMPILER_ID:GNU>,$<NOT:$<CONFIG:Debug>>>:-Wno-array-bounds;-Wno-restrict;-Wno-stringop-overflow>")
   if(ZULMETADATA_SANITIZERS)
     target_compile_options(${target} PUBLIC

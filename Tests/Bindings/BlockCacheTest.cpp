@@ -22,7 +22,7 @@ std::string numbered(std::size_t size) {
 /// Bytes that count how often they are asked for.
 struct Slices {
     std::string bytes;
-    std::size_t most = std::string::npos; ///< given at a time
+    std::size_t most = std::string::npos; ///< bytes that one read returns
     std::size_t reads = 0;
     std::size_t read = 0;
 

@@ -27,7 +27,7 @@ struct ToolOptions {
     bool keepsInputOpen = false;                                  ///< behind it, until the program ends
     Channel output = Channel::Pipe;
     Channel errors = Channel::Pipe;
-    int slownessMilliseconds = 0;                         ///< waited in front of every read of standard output
+    int slownessMilliseconds = 0;                         ///< waited before every read of standard output
     std::string folder;                                   ///< to start in; the test's own where empty
     int killAfterMilliseconds = 0;                        ///< sends `killSignal` then; 0 is never
     std::function<bool()> killWhen = [] { return true; }; ///< but not before this is true

@@ -30,7 +30,7 @@ public:
     /// Begins the object of the file `name`, which is written in pieces. Only for a report that is wanted.
     JsonWriter& beginFile(const std::string& name);
 
-    /// For what is written in pieces. Only for a report that is wanted.
+    /// Returns the writer, for a document that is written in pieces. Requires a report that is wanted.
     JsonWriter& writer() { return writer_; }
 
     /// Ends what is open of the object of the file before this one.

@@ -61,7 +61,7 @@ struct ContainerItem {
 
     std::uint64_t payloadOffset() const { return offset + headerSize; } ///< returns a position in the file
 
-    /// Returns where the next item begins, except for a pad byte. Has no meaning if the size is 0 or overflows.
+    /// Returns the position after the item, without its pad byte. Has no meaning if the size is 0 or overflows.
     std::uint64_t end() const { return offset + size; }
 
     /// Returns 0 if the declared size does not even cover the header.
@@ -90,13 +90,13 @@ public:
     std::optional<ContainerItem> itemAt(std::uint64_t position) const;
 
     void moveTo(std::uint64_t position) { position_ = position; }  ///< the next item is read there
-    std::uint64_t position() const { return position_; }           ///< returns where the next item is read
-    std::uint64_t end() const { return end_; }                     ///< returns where the walk ends at the latest
+    std::uint64_t position() const { return position_; }           ///< returns the position of the next item
+    std::uint64_t end() const { return end_; }                     ///< returns the last position that a walk can reach
     bool isMovie() const { return type_ == Container::QuickTime; } ///< returns whether the items are atoms
     const ByteSource& source() const;                              ///< returns the file
     detail::ByteReader& reader() const { return *reader_; }        ///< is for the library itself
 
-    /// Returns where the item after this one begins: chunks of an odd size are followed by a byte of padding.
+    /// Returns the position of the item after this one. A byte of padding follows a chunk of an odd size.
     std::uint64_t after(const ContainerItem& item) const { return item.end() + (isMovie() ? 0 : item.size % 2); }
 
     /// Takes the 32-bit sizes 0 and 2 to 7 literally, as a repair does.

@@ -22,7 +22,7 @@ struct Track {
     std::uint32_t defaultDuration = 0; ///< of a sample
     std::optional<double> begin;       ///< of its first fragment
     double end = 0;
-    bool isPlaced = true; ///< whether every fragment says where it begins
+    bool isPlaced = true; ///< whether every fragment has a start time
 
     double seconds(double time) const { return timescale == 0 ? 0 : time / timescale; }
 };

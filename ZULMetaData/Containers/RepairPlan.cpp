@@ -167,7 +167,7 @@ private:
     }
 
     /// Whether what follows the atom before belongs to nothing: the atom is one of this library, and its contents end
-    /// where it does. If it was given a wrong size, its own streams would follow it.
+    /// where it does. If its size were wrong, its own streams would follow it.
     bool isFollowedByStrayBytes() {
         if (!isOwn(previous_) || previous_.holdsRecordingInfo())
             return isOwn(previous_) && previous_.size == detail::s_extendedAtomHeaderSize + sizeof(ZCAPHeader);
@@ -290,7 +290,7 @@ private:
                                : "The atom 'ZULM' ends where the file does.");
     }
 
-    /// Up to where the atom's children are whole or can be made so; the whole file where that is not certain.
+    /// Returns the end of the children that are whole or can be made so, or the end of the file if that is not certain.
     std::uint64_t endOfWholeStreams(const ContainerItem& metaData) {
         std::uint64_t position = metaData.offset + metaData.headerSize;
         while (position < total_) {

@@ -25,7 +25,7 @@ bool overwrite(std::fstream& movie, std::uint64_t position, std::span<const char
 /// `last` reaches to the end of the movie, `remaining` bytes on, and `previous` is the atom before it.
 bool closeOpenAtom(std::fstream& movie, const ContainerItem& last, const ContainerItem& previous,
                    std::uint64_t remaining) {
-    if (last.isExtended()) // what an interrupted append leaves behind
+    if (last.isExtended()) // as after an interrupted append
         return overwrite(movie, last.offset + detail::s_extendedSizeOffset, detail::bigEndianBytes(remaining));
     if (remaining <= 0xffffffff)
         return overwrite(movie, last.offset, detail::bigEndianBytes(static_cast<std::uint32_t>(remaining)));

@@ -20,7 +20,7 @@ public:
     FileError(const std::string& file, const std::system_error& error)
         : std::system_error(error.code()), file_(file), sentence_(error.what()), text_(file + ": " + sentence_) {}
 
-    const std::string& file() const { return file_; }                    ///< the name that the file was given by
+    const std::string& file() const { return file_; }                    ///< the name that the caller uses
     const std::string& sentence() const { return sentence_; }            ///< `what()` without the file
     const char* what() const noexcept override { return text_.c_str(); } ///< returns the whole sentence
 

@@ -26,8 +26,8 @@ ZULMETADATA_API std::uint32_t entrySizeOf(const MetaDataHeader& header);
 /// Returns the time of an entry in seconds. It is empty if the entry does not fit its kind or cannot be decoded.
 ZULMETADATA_API std::optional<double> timeOfEntry(const MetaDataHeader& header, std::string_view bytes);
 
-/// Calls `visit(entry, bytes)` for each entry until it returns false. Returns where the entry that it refused begins,
-/// or where the last whole entry ends.
+/// Calls `visit(entry, bytes)` for each entry until it returns false. Returns the offset of the entry that it
+/// refused, or the end of the last whole entry.
 template <class Visit>
 std::uint64_t walkEntries(StreamEntries& entries, Visit visit) {
     while (const auto entry = entries.next())

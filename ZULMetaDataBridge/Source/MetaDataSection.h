@@ -1,6 +1,6 @@
 #pragma once
 
-// Writes streams to the end of a movie or RIFF file as one `ZULM` item. Used where a whole file is written anew; a
+// Writes streams to the end of a movie or RIFF file as one `ZULM` item. Used to write a whole file anew; a
 // movie that must not be lost is changed by `SafeMovieSave`.
 
 #include "ZULMetaData/ByteSource.h"

@@ -26,7 +26,7 @@ public:
     /// Returns whether the movie is still the file that was opened, and not one that took its name.
     bool isInPlace() const { return file_.isNamed(location_); }
 
-    /// Returns where the movie ends, and the next bytes go.
+    /// Returns the end of the movie. The next bytes are appended there.
     std::uint64_t end() const { return end_; }
 
     /// Makes the changes one after the other, each on the disk before the next.

@@ -32,7 +32,7 @@ void requireWholeContainer(const ByteSource& file, Container::Type type, const s
         throw Error(Error::Reason::Damaged, plan.finding.empty() ? "its parts do not fill the file" : plan.finding);
 }
 
-/// Ends the file where it was written or skipped to. Returns its size.
+/// Ends the file at its write position. Returns its size.
 template <class Error, class Output>
 std::uint64_t finishCopy(Output& out, const FileLocation& copy) {
     const auto end = out.tellp();

@@ -166,7 +166,7 @@ private:
         });
     }
 
-    /// References to chapters go where the chapters go.
+    /// References to chapters are removed together with the chapters.
     void addReferences(const ContainerItem& item, const std::string& path) {
         forEachChild(item, item.payloadOffset(), [&](const ContainerItem& child) {
             if (child.type != "chap")

@@ -185,7 +185,7 @@ private:
         return Next::Stops;
     }
 
-    /// Returns where the atom ends if that is before a tail that its size only counts.
+    /// Returns the true end of an atom whose size counts a tail that was never written.
     std::optional<std::uint64_t> walkStreamAtom(const ContainerItem& atom, const ItemWalk& children,
                                                 const Surroundings& around) {
         if (!atom.isExtended())

@@ -10,7 +10,7 @@ namespace ZULMetaData::detail {
 using IsNextStream = std::function<bool(std::uint64_t)>;
 
 struct WalkedStream {
-    std::uint64_t wholeEnd; ///< of the last whole entry; the stream's end where it has no whole header
+    std::uint64_t wholeEnd; ///< the end of the last whole entry, or of the stream if it has no whole header
     bool isTailLeftOut;     ///< whether the next stream begins there, so that a torn entry was never copied
 };
 
