@@ -8,7 +8,7 @@ namespace Zulm {
 
 using namespace ZULMetaData;
 
-void DumpDocument::beginFile(const Recording& recording) {
+void DumpDocument::beginFile(const RecordingFile& recording) {
     writer_.beginObject();
     writer_.members(fileHeader(recording.name()));
     writer_.member("container", containerName(recording.container()));
@@ -37,7 +37,7 @@ void DumpDocument::endFile() {
     writer_.end();
 }
 
-void writeDump(Recording& recording, const std::vector<StreamReport>& streams, const TextSink& sink) {
+void writeDump(RecordingFile& recording, const std::vector<StreamReport>& streams, const TextSink& sink) {
     JsonWriter writer(sink, JsonWriter::Style::Lines);
     beginReport(writer, "dump");
     DumpDocument document(writer);

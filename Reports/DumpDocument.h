@@ -4,7 +4,7 @@
 // into memory as a document.
 
 #include "Reports/JsonWriter.h"
-#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 
 #include <vector>
 
@@ -15,7 +15,7 @@ public:
     /// `writer` has the "files" of a report open and must outlive this.
     explicit DumpDocument(JsonWriter& writer) : writer_(writer) {}
 
-    void beginFile(const ZULMetaData::Recording& recording);
+    void beginFile(const ZULMetaData::RecordingFile& recording);
 
     /// A stream that is not decoded has no entries.
     void beginStream(const ZULMetaData::StreamReport& stream, bool isDecoded);
@@ -29,7 +29,7 @@ private:
 };
 
 /// The whole document of one file, with every entry of these of its streams.
-void writeDump(ZULMetaData::Recording& recording, const std::vector<ZULMetaData::StreamReport>& streams,
+void writeDump(ZULMetaData::RecordingFile& recording, const std::vector<ZULMetaData::StreamReport>& streams,
                const TextSink& sink);
 
 } // namespace Zulm

@@ -54,18 +54,18 @@ std::optional<double> entriesPerSecond(const StreamReport& stream) {
     return std::isfinite(rate) && rate > 0 ? std::optional(rate) : std::nullopt;
 }
 
-void visitForeignAtoms(Recording& recording, const std::function<void(const LayoutItem& atom)>& visit) {
+void visitForeignAtoms(RecordingFile& recording, const std::function<void(const LayoutItem& atom)>& visit) {
     walkLayout(recording, LayoutPart::MetaData, {[&](const LayoutItem& item, bool) {
                    if (item.isForeign)
                        visit(item);
                }});
 }
 
-FileInfo inspect(Recording& recording) {
+FileInfo inspect(RecordingFile& recording) {
     return {recording.duration(), recording.examinedStreams(), recording.creators()};
 }
 
-void writeInfo(JsonWriter& writer, Recording& recording, const FileInfo& file) {
+void writeInfo(JsonWriter& writer, RecordingFile& recording, const FileInfo& file) {
     writer.beginObject();
     writer.members(fileHeader(recording.name()));
     writer.members({{"container", containerName(recording.container())},
@@ -82,7 +82,7 @@ void writeInfo(JsonWriter& writer, Recording& recording, const FileInfo& file) {
     writer.end();
 }
 
-Json infoDocument(Recording& recording) {
+Json infoDocument(RecordingFile& recording) {
     std::string text;
     JsonWriter writer([&text](std::string_view piece) { text += piece; }, JsonWriter::Style::Lines);
     writeInfo(writer, recording, inspect(recording));

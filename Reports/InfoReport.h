@@ -4,7 +4,7 @@
 
 #include "Reports/JsonWriter.h"
 #include "Reports/Layout.h"
-#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 
 #include <nlohmann/json.hpp>
 
@@ -23,22 +23,22 @@ struct FileInfo {
 };
 
 /// Throws `FileError` if the file cannot be read.
-FileInfo inspect(ZULMetaData::Recording& recording);
+FileInfo inspect(ZULMetaData::RecordingFile& recording);
 
 /// The rate between the first and the last entry; empty if they are at one time or have none.
 std::optional<double> entriesPerSecond(const ZULMetaData::StreamReport& stream);
 
 /// Visits what lies inside of the file's metadata and is no stream.
-void visitForeignAtoms(ZULMetaData::Recording& recording, const std::function<void(const LayoutItem& atom)>& visit);
+void visitForeignAtoms(ZULMetaData::RecordingFile& recording, const std::function<void(const LayoutItem& atom)>& visit);
 
 /// The texts of a creator with everything that is stored in their fields.
 nlohmann::ordered_json creatorDocument(const ZULMetaData::CreatorAttributes& creator);
 std::string shownCreator(const ZULMetaData::CreatorAttributes& creator); ///< "Mac 1.2 on version 6.1.0"
 
 /// Writes the file's object of `zulm info --json`.
-void writeInfo(JsonWriter& writer, ZULMetaData::Recording& recording, const FileInfo& file);
+void writeInfo(JsonWriter& writer, ZULMetaData::RecordingFile& recording, const FileInfo& file);
 
 /// The same object as a whole.
-nlohmann::ordered_json infoDocument(ZULMetaData::Recording& recording);
+nlohmann::ordered_json infoDocument(ZULMetaData::RecordingFile& recording);
 
 } // namespace Zulm

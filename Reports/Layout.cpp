@@ -1,7 +1,7 @@
 #include "Reports/Layout.h"
 
 #include "Reports/Text.h"
-#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 
 #include <fmt/core.h>
 
@@ -74,7 +74,7 @@ std::string LayoutItem::headerForm() const {
     return item.isExtended() ? "extended" : "32-bit";
 }
 
-void walkLayout(Recording& recording, LayoutPart part, const LayoutVisitor& visitor) {
+void walkLayout(RecordingFile& recording, LayoutPart part, const LayoutVisitor& visitor) {
     walk(ItemWalk(recording.bytes(), recording.container()), part, visitor, false);
 }
 

@@ -11,7 +11,7 @@
 
 namespace ZULMetaData {
 
-class Recording;
+class RecordingFile;
 
 } // namespace ZULMetaData
 
@@ -50,6 +50,6 @@ struct LayoutVisitor {
 enum class LayoutPart { Whole, MetaData };
 
 /// Visits the items of a container, and no item of a bare stream. Throws `FileError` if the file cannot be read.
-void walkLayout(ZULMetaData::Recording& recording, LayoutPart part, const LayoutVisitor& visitor);
+void walkLayout(ZULMetaData::RecordingFile& recording, LayoutPart part, const LayoutVisitor& visitor);
 
 } // namespace Zulm

@@ -91,7 +91,7 @@ struct HumanReadableActions;
 struct KeyCaption;
 struct KeyEvent;
 struct KeyName;
-class Recording;
+class RecordingFile;
 struct RedactedEntry;
 struct RedactedStream;
 struct RedactedTexts;

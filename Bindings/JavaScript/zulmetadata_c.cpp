@@ -8,7 +8,7 @@
 #include "Reports/JsonWriter.h"
 #include "Reports/Text.h"
 #include "ZULMetaDataBridge/Source/KeyCaptions.h"
-#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 #include "ZULMetaDataBridge/Source/StoredFields.h"
 
@@ -48,7 +48,7 @@ struct ZulmRecording {
 
     static std::vector<Stream> summarized(const std::vector<StreamReport>& reports);
 
-    Recording recording;
+    RecordingFile recording;
     std::optional<double> duration;
     std::vector<Stream> found;
     std::vector<Stream> hidden;
@@ -118,7 +118,7 @@ constexpr ZulmColumnType columnType() {
 
 /// Collects the entries of a stream.
 template <class Kind>
-void collect(const Recording& recording, const StreamReport& stream, ZulmEntries& entries) {
+void collect(const RecordingFile& recording, const StreamReport& stream, ZulmEntries& entries) {
     using Value = typename Kind::Value;
     ZULMetaData::detail::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
         entries.columns.emplace_back(key, columnType<Stored>());
@@ -159,7 +159,8 @@ ZulmEntries* readEntries(const ZulmRecording& opened, const StreamReport& stream
 }
 
 /// Collects one row for each key.
-void collectKeyCaptions(const Recording& recording, const StreamReport& stream, bool showsKeys, ZulmEntries& entries) {
+void collectKeyCaptions(const RecordingFile& recording, const StreamReport& stream, bool showsKeys,
+                        ZulmEntries& entries) {
     std::vector<KeyEvent> keys;
     recording.readEntries<KeyStroke>(stream, [&keys](double time, const KeyStroke& key) {
         keys.push_back({time, key});
@@ -295,7 +296,7 @@ ZulmText* zulm_info(ZulmRecording* recording) {
 
 ZulmText* zulm_verify(ZulmRecording* recording) {
     return orNull([&] {
-        Recording& opened = recording->recording;
+        RecordingFile& opened = recording->recording;
         return new ZulmText{Zulm::jsonLines(Zulm::verifyDocument(opened.name(), opened.validation()))};
     });
 }

@@ -5,7 +5,7 @@
 #include "Bindings/Python/StreamWriter.h"
 #include "ZULMetaDataBridge/Source/HumanReadableActions.h"
 #include "ZULMetaDataBridge/Source/KeyNames.h"
-#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
@@ -23,9 +23,9 @@ namespace ZULMetaData::Python {
 namespace {
 
 /// Throws `OSError` for a file that cannot be opened or read, `ValueError` for one that can hold no metadata.
-Recording openRecording(const FileLocation& file) {
+RecordingFile openRecording(const FileLocation& file) {
     try {
-        return Recording(file);
+        return RecordingFile(file);
     } catch (const FileError&) {
         throw;
     } catch (const std::runtime_error& refusal) {
@@ -51,7 +51,7 @@ struct RecordingFile {
 };
 
 RecordingFile lookInto(const FileLocation& file) {
-    const Recording recording = openRecording(file);
+    const RecordingFile recording = openRecording(file);
     RecordingFile found{containerName(recording.container()), recording.duration(), {}, {}};
     for (const ZCAPHeader& info : recording.creators())
         found.creators.push_back(info.creator);
@@ -103,7 +103,7 @@ RepairPlan repair(const FileLocation& movie, bool dryRun) {
 }
 
 ValidationReport verify(const FileLocation& file) {
-    Recording recording = openRecording(file);
+    RecordingFile recording = openRecording(file);
     const py::gil_scoped_release others;
     return recording.validation();
 }

@@ -22,7 +22,7 @@ protected:
     /// Writes the recording anew and returns the copy's bytes.
     std::string compacted(const std::string& name, const std::string& bytes, KeptMetaData kept = KeptMetaData::Newest) {
         writeFile(folder / name, bytes);
-        Recording recording(folder / name);
+        RecordingFile recording(folder / name);
         RecordingCompaction compaction(recording, kept);
         const std::string copy = folder / ("Copy-" + name);
         writeFile(copy, bytes.substr(0, static_cast<std::size_t>(compaction.copiedBytes())));
@@ -81,7 +81,7 @@ TEST_F(RecordingCompactionTest, SaysThatADiskIsFull) {
          {std::pair<std::string, std::string>{"a.mp4", media() + zulmAtom({locationStream()})},
           {"a.avi", riffMedia() + zulmChunk({locationStream()})}}) {
         writeFile(folder / name, bytes);
-        Recording recording(folder / name);
+        RecordingFile recording(folder / name);
         RecordingCompaction compaction(recording, KeptMetaData::Newest);
         const std::string copy = folder / ("Copy-" + name);
         writeFile(copy, bytes.substr(0, static_cast<std::size_t>(compaction.copiedBytes())));

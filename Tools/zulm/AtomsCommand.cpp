@@ -36,7 +36,7 @@ Json itemDocument(const LayoutItem& entry) {
 }
 
 /// A file may hold millions of atoms, so they are written as they are met; where they end is found by a second walk.
-void writeReport(Recording& recording, const LayoutVisitor& ends, RunReport& report) {
+void writeReport(RecordingFile& recording, const LayoutVisitor& ends, RunReport& report) {
     JsonWriter& writer = report.beginFile(recording.name());
     writer.member("container", containerName(recording.container()));
     writer.member("bytes", recording.size());
@@ -71,7 +71,7 @@ void printItem(const LayoutItem& entry, bool isChild) {
     writeOutput(line + '\n');
 }
 
-void print(Recording& recording, const LayoutVisitor& ends) {
+void print(RecordingFile& recording, const LayoutVisitor& ends) {
     writeOutput(fmt::format("{}: {}, {} bytes\n", shown(recording.name()), containerName(recording.container()),
                             recording.size()));
     writeOutput(
@@ -83,7 +83,7 @@ void print(Recording& recording, const LayoutVisitor& ends) {
 
 ExitCode showAtoms(const std::string& path, RunReport& report) {
     const InputFile input(path);
-    Recording recording = input.open();
+    RecordingFile recording = input.open();
     if (recording.container() == Container::RawStream)
         throw Failure(
             fmt::format("{}: a bare stream has no atoms; 'zulm info {}' shows what it is", path, shellWord(path)));

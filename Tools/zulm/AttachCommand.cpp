@@ -75,7 +75,7 @@ void complainAboutOldMovie(const std::string& path, const std::string& what, Str
 }
 
 void takeStreamsOfOldMovie(const AttachOptions& options, Streams& streams) {
-    Recording old = openRecording(options.from);
+    RecordingFile old = openRecording(options.from);
     for (const StreamInfo& stream : old.streams()) {
         if (options.replace && streams.types.contains(stream.type))
             continue; // a stream file takes its place

@@ -38,7 +38,7 @@ std::string checkKind(const std::string& kind) {
 
 } // namespace
 
-std::vector<StreamInfo> chosenStreams(Recording& recording, const std::vector<std::string>& kinds) {
+std::vector<StreamInfo> chosenStreams(RecordingFile& recording, const std::vector<std::string>& kinds) {
     std::vector<StreamInfo> streams = recording.streams();
     std::erase_if(streams, [&kinds](const StreamInfo& stream) { return !isChosen(stream.type, kinds); });
     return streams;
@@ -68,7 +68,7 @@ uuid typeNamed(const std::string& kind) {
     return type;
 }
 
-ExitCode complainAboutNothing(const Recording& recording, const std::vector<std::string>& kinds) {
+ExitCode complainAboutNothing(const RecordingFile& recording, const std::vector<std::string>& kinds) {
     const std::string& name = recording.name();
     if (kinds.empty())
         complain(fmt::format("{}: has no recording metadata; 'zulm salvage {} -o DIR' finds what no reader does", name,
@@ -79,7 +79,7 @@ ExitCode complainAboutNothing(const Recording& recording, const std::vector<std:
     return ExitNoMetaData;
 }
 
-ExitCode complainAboutRest(const Recording& recording, const StreamInfo& stream, std::uint64_t end,
+ExitCode complainAboutRest(const RecordingFile& recording, const StreamInfo& stream, std::uint64_t end,
                            const char* treated) {
     if (end >= stream.declaredBytes)
         return ExitFine;

@@ -3,7 +3,7 @@
 // Which streams of a recording a command works on, and the option that names their kinds.
 
 #include "Tools/zulm/Command.h"
-#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 
 #include <cstddef>
 #include <cstdint>
@@ -13,7 +13,7 @@
 namespace Zulm {
 
 /// Returns the streams in the order of their identifiers. If `kinds` is not empty, returns only those kinds.
-std::vector<ZULMetaData::StreamInfo> chosenStreams(ZULMetaData::Recording& recording,
+std::vector<ZULMetaData::StreamInfo> chosenStreams(ZULMetaData::RecordingFile& recording,
                                                    const std::vector<std::string>& kinds);
 
 /// Adds an option that takes the names of kinds and, for kinds that have none, identifiers.
@@ -41,11 +41,11 @@ void requireKinds(const std::string& option, const std::vector<std::string>& kin
 ZULMetaData::uuid typeNamed(const std::string& kind);
 
 /// Complains that there is nothing to work on: no metadata at all, or not of `kinds`.
-ExitCode complainAboutNothing(const ZULMetaData::Recording& recording, const std::vector<std::string>& kinds);
+ExitCode complainAboutNothing(const ZULMetaData::RecordingFile& recording, const std::vector<std::string>& kinds);
 
 /// Complains if a stream goes on after its first `end` bytes, which is as far as it could be `treated`: "read" or
 /// "searched". Returns how the command ends.
-ExitCode complainAboutRest(const ZULMetaData::Recording& recording, const ZULMetaData::StreamInfo& stream,
+ExitCode complainAboutRest(const ZULMetaData::RecordingFile& recording, const ZULMetaData::StreamInfo& stream,
                            std::uint64_t end, const char* treated = "read");
 
 /// FOLDER/NAME.dat, and FOLDER/NAME-2.dat and so on from the second on.

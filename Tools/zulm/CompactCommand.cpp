@@ -90,7 +90,7 @@ std::string hintFor(CompactionError::Reason reason, const std::string& name) {
     }
 }
 
-ExitCode writeCopy(const TailOptions& options, Recording& recording, RunReport& report) {
+ExitCode writeCopy(const TailOptions& options, RecordingFile& recording, RunReport& report) {
     RecordingCompaction compaction(recording, options.kept);
     if (compaction.streams().size() + compaction.streamsLeftOut() + compaction.creatorsLeftOut() == 0)
         return complainAboutNothing(recording, {});
@@ -111,7 +111,7 @@ ExitCode writeCopy(const TailOptions& options, Recording& recording, RunReport& 
 ExitCode writeTail(const TailOptions& options, RunReport& report) {
     const std::optional<DurableFile> lock = lockOf(options);
     const InputFile input(options.save.movie);
-    Recording recording = input.open();
+    RecordingFile recording = input.open();
     if (!options.save.inPlace)
         requireOutputName(options.save.output, recording.container(), input.path());
     try {

@@ -36,7 +36,7 @@ constexpr double s_untilTheNext = std::numeric_limits<double>::infinity();
 /// Collects what is said in the streams of one recording.
 class CaptionReader {
 public:
-    CaptionReader(const ConvertOptions& options, Recording& recording, std::optional<double> duration)
+    CaptionReader(const ConvertOptions& options, RecordingFile& recording, std::optional<double> duration)
         : options_(options), recording_(recording), end_(endOfCaptions(duration)) {}
 
     void read(const StreamInfo& stream) {
@@ -106,7 +106,7 @@ private:
     }
 
     const ConvertOptions& options_;
-    Recording& recording_;
+    RecordingFile& recording_;
     double end_;
     std::vector<Caption> captions_;
     ExitCode code_ = ExitFine;
@@ -120,14 +120,14 @@ std::vector<std::string> kindsFor(const ConvertOptions& options) {
 }
 
 /// Returns nothing for a movie that tells no length, as one that was never finished.
-std::optional<double> lengthOf(Recording& recording) {
+std::optional<double> lengthOf(RecordingFile& recording) {
     const std::optional<double> duration = recording.duration();
     return duration && *duration > 0 ? duration : std::nullopt;
 }
 
 ExitCode runConvert(const ConvertOptions& options) {
     const InputFile input(options.file);
-    Recording recording = input.open();
+    RecordingFile recording = input.open();
     const std::vector<std::string> kinds = kindsFor(options);
     const std::vector<StreamInfo> streams = chosenStreams(recording, kinds);
     if (streams.empty())

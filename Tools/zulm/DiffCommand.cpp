@@ -68,7 +68,7 @@ Json documentOf(const MetaDataHeader& header, const std::string& bytes) {
 /// One of the two streams, with the entry that comes next.
 class Side {
 public:
-    Side(Recording& recording, const StreamInfo& stream)
+    Side(RecordingFile& recording, const StreamInfo& stream)
         : recording_(recording), stream_(stream), entries_(recording.entriesOf(stream)) {
         advance();
     }
@@ -97,7 +97,7 @@ public:
     void complainAboutRest() const { Zulm::complainAboutRest(recording_, stream_, end_); }
 
 private:
-    Recording& recording_;
+    RecordingFile& recording_;
     StreamInfo stream_;
     StreamEntries entries_;
     std::optional<StreamEntry> current_;
@@ -286,7 +286,7 @@ private:
 class Comparison {
 public:
     /// The streams become elements of the array that `writer` has open; they are printed if it is null.
-    Comparison(const DiffOptions& options, Recording& left, Recording& right, JsonWriter* writer)
+    Comparison(const DiffOptions& options, RecordingFile& left, RecordingFile& right, JsonWriter* writer)
         : options_(options), left_(left), right_(right), writer_(writer) {}
 
     /// The streams of both sides, merged in the order of their identifiers.
@@ -338,8 +338,8 @@ private:
     }
 
     const DiffOptions& options_;
-    Recording& left_;
-    Recording& right_;
+    RecordingFile& left_;
+    RecordingFile& right_;
     JsonWriter* writer_;
     ExitCode code_ = ExitFine;
 };
@@ -347,8 +347,8 @@ private:
 ExitCode diff(const DiffOptions& options, RunReport& report) {
     const InputFile leftFile(options.left);
     const InputFile rightFile(options.right);
-    Recording left = leftFile.open();
-    Recording right = rightFile.open();
+    RecordingFile left = leftFile.open();
+    RecordingFile right = rightFile.open();
     const auto leftStreams = chosenStreams(left, options.kinds);
     const auto rightStreams = chosenStreams(right, options.kinds);
     if (leftStreams.empty() && rightStreams.empty())

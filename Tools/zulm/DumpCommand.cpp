@@ -43,7 +43,7 @@ struct DumpOptions {
 template <class Kind>
 class EntryPrinter {
 public:
-    EntryPrinter(const DumpOptions& options, Recording& recording, Printout& printout, const StreamReport& stream)
+    EntryPrinter(const DumpOptions& options, RecordingFile& recording, Printout& printout, const StreamReport& stream)
         : options_(options), recording_(recording), printout_(printout), stream_(stream) {
         if (!isTerminal(stdout))
             progress_.emplace("reading " + stream.name(), stream.readableBytes);
@@ -81,7 +81,7 @@ private:
     static bool isPNG(std::string_view bytes) { return bytes.starts_with("\x89PNG\r\n\x1a\n"); }
 
     const DumpOptions& options_;
-    Recording& recording_;
+    RecordingFile& recording_;
     Printout& printout_;
     const StreamReport& stream_;
     std::optional<Progress> progress_;
@@ -89,7 +89,7 @@ private:
 };
 
 template <class Kind>
-void dumpEntries(Recording& recording, const DumpOptions& options, Printout& printout, const StreamReport& stream) {
+void dumpEntries(RecordingFile& recording, const DumpOptions& options, Printout& printout, const StreamReport& stream) {
     EntryPrinter<Kind> printer(options, recording, printout, stream);
     recording.readEntries<typename Kind::Value>(stream, [&printer](double time, const typename Kind::Value& value) {
         printer.print(time, value);
@@ -101,8 +101,8 @@ void dumpEntries(Recording& recording, const DumpOptions& options, Printout& pri
     say(fmt::format("{}: {} entries of {} read", recording.name(), printer.read(), stream.name()));
 }
 
-ExitCode dumpStream(Recording& recording, const DumpOptions& options, Printout& printout, const StreamReport& stream,
-                    bool isOnlyOne) {
+ExitCode dumpStream(RecordingFile& recording, const DumpOptions& options, Printout& printout,
+                    const StreamReport& stream, bool isOnlyOne) {
     const std::string damage = damageIn(stream);
     bool isShown = true;
     const bool isDecoded =
@@ -151,7 +151,7 @@ StreamsToDump streamsToDump(const std::vector<StreamInfo>& available, const Dump
 
 ExitCode dumpFile(const std::string& path, const DumpOptions& options, Printout& printout) {
     const InputFile input(path);
-    Recording recording = input.open();
+    RecordingFile recording = input.open();
     const std::vector<StreamInfo> available = recording.streams();
     const auto [streams, missing] = streamsToDump(available, options);
     printout.beginFile(recording);

@@ -48,7 +48,7 @@ Json streamDocument(const StreamInfo& stream, const std::string& output) {
 
 ExitCode extract(const ExtractOptions& options, RunReport& report) {
     const InputFile input(options.file);
-    Recording recording = input.open();
+    RecordingFile recording = input.open();
     const std::vector<StreamInfo> streams = chosenStreams(recording, options.kinds);
     if (streams.empty())
         return complainAboutNothing(recording, options.kinds);

@@ -132,7 +132,7 @@ private:
     const GrepOptions& options_;
     const TextPattern& pattern_;
     InputFile input_;
-    Recording recording_;
+    RecordingFile recording_;
     RunReport& report_;
     std::uint64_t matches_ = 0;
     bool isDamaged_ = false;

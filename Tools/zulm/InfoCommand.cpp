@@ -49,7 +49,7 @@ std::string creatorLine(const CreatorAttributes& creator) {
                        isPlatform ? " (the name is the platform's: no stamp stores the creator's)" : "");
 }
 
-void print(Recording& recording, const FileInfo& file) {
+void print(RecordingFile& recording, const FileInfo& file) {
     const std::string duration = file.duration ? fmt::format("{:.3f} s", *file.duration) : "duration not told";
     writeOutput(fmt::format("{}: {}, {}, {}, {} stream{}\n", shown(recording.name()),
                             containerName(recording.container()), duration, bytesText(recording.size()),
@@ -82,7 +82,7 @@ void warnOf(const std::string& name, const ValidationReport& validation) {
 
 ExitCode showInfo(const std::string& path, RunReport& report) {
     const InputFile input(path);
-    Recording recording = input.open();
+    RecordingFile recording = input.open();
     const FileInfo file = inspect(recording);
     warnOf(recording.name(), recording.validation());
     if (report.isWanted())

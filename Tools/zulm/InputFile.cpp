@@ -91,7 +91,7 @@ InputFile::InputFile(const std::string& argument) : name_(argument), path_(argum
 InputFile::~InputFile() = default;
 InputFile::InputFile(InputFile&&) noexcept = default;
 
-ZULMetaData::Recording InputFile::open() const {
+ZULMetaData::RecordingFile InputFile::open() const {
     return openRecording(path_, name_);
 }
 
@@ -111,9 +111,9 @@ void InputFile::spool() {
     say(fmt::format("{}: standard input is kept in {} meanwhile", name_, path_));
 }
 
-ZULMetaData::Recording openRecording(const std::string& path, const std::string& name) {
+ZULMetaData::RecordingFile openRecording(const std::string& path, const std::string& name) {
     requireFile(path);
-    ZULMetaData::Recording recording(path, name);
+    ZULMetaData::RecordingFile recording(path, name);
     const char* container = containerName(recording.container());
     if (isNamedOtherwise(path, recording.container()))
         warn(fmt::format("{}: is a {} by its contents, whatever its name says", recording.name(), container));

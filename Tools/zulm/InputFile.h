@@ -2,7 +2,7 @@
 
 // A file to read that was named on the command line, where "-" is standard input.
 
-#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 
 #include <memory>
 #include <string>
@@ -28,7 +28,7 @@ public:
     const std::string& name() const { return name_; }
 
     /// Opens it as `openRecording` does. This must outlive the recording.
-    ZULMetaData::Recording open() const;
+    ZULMetaData::RecordingFile open() const;
 
 private:
     void spool();
@@ -39,8 +39,8 @@ private:
 };
 
 /// Opens a recording, and warns if its name tells another container than its contents do. Throws `Failure` unless it is
-/// a regular file, and what `Recording` throws. Messages call it `name`, or by its path if `name` is empty.
-ZULMetaData::Recording openRecording(const std::string& path, const std::string& name = {});
+/// a regular file, and what `RecordingFile` throws. Messages call it `name`, or by its path if `name` is empty.
+ZULMetaData::RecordingFile openRecording(const std::string& path, const std::string& name = {});
 
 /// Whether a file's name tells another container than its contents do, so that programs that go by the name fail.
 bool isNamedOtherwise(const std::string& path, ZULMetaData::Container::Type type);

@@ -93,7 +93,7 @@ Printout::Printout(EntryFormat format, const Columns& columns, bool hasSeveralFi
         document_.emplace(*writer);
 }
 
-void Printout::beginFile(const Recording& recording) {
+void Printout::beginFile(const RecordingFile& recording) {
     file_ = recording.name();
     if (document_)
         document_->beginFile(recording);

@@ -42,7 +42,7 @@ public:
     /// `writer` has the "files" of a report open; it is null for other formats than JSON.
     Printout(EntryFormat format, const Columns& columns, bool hasSeveralFiles, JsonWriter* writer);
 
-    void beginFile(const ZULMetaData::Recording& recording);
+    void beginFile(const ZULMetaData::RecordingFile& recording);
 
     /// `keys` are those of the stream's entries; null if these cannot be decoded.
     void beginStream(const ZULMetaData::StreamReport& stream, const ZULMetaData::EntryKeys* keys, bool isOnlyOne);

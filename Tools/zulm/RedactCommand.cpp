@@ -107,7 +107,7 @@ ExitCode complainAboutWhatIsLeftOut(const std::string& name, const RedactedRecor
 }
 
 ExitCode complainAboutDamage(const std::string& path, const std::string& output) {
-    Recording copy = openRecording(path, output);
+    RecordingFile copy = openRecording(path, output);
     if (!copy.validation().isDamaged())
         return ExitFine;
     complain(fmt::format("{}: what was damaged in the input still is in the copy; 'zulm verify {}' says what", output,
@@ -198,7 +198,7 @@ ExitCode write(const RedactOptions& options, RecordingRedactor& redactor, RunRep
 
 ExitCode redact(const RedactOptions& options, RunReport& report) {
     const InputFile input(options.file);
-    Recording recording = input.open();
+    RecordingFile recording = input.open();
     if (!options.dryRun)
         requireOutputName(options.output, recording.container(), input.path());
     RecordingRedaction redaction = redactionFor(options);

@@ -105,7 +105,7 @@ void writePage(OutputFile& file, const ViewOptions& options, const InputFile& in
 }
 
 /// Where the page finds the movie; null where there is none to show.
-Json movieFor(const ViewOptions& options, const InputFile& input, Recording& recording) {
+Json movieFor(const ViewOptions& options, const InputFile& input, RecordingFile& recording) {
     const bool isStream = recording.container() == Container::RawStream;
     if (isStream && options.embed)
         throw Failure(fmt::format("{}: is a stream alone, without a movie to embed", input.name()));
@@ -123,7 +123,7 @@ Json movieFor(const ViewOptions& options, const InputFile& input, Recording& rec
 
 ExitCode runView(const ViewOptions& options) {
     const InputFile input(options.file);
-    Recording recording = input.open();
+    RecordingFile recording = input.open();
     if (recording.streams().empty())
         return complainAboutNothing(recording, {});
     const PageParts page(options);

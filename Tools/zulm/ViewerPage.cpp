@@ -25,7 +25,7 @@ bool isPlainInAddress(char c) {
 
 } // namespace
 
-Json viewDocument(Recording& recording, const Json& movie) {
+Json viewDocument(RecordingFile& recording, const Json& movie) {
     const std::string excerpt = orFileError(recording.name(), [&] { return metaDataExcerpt(recording.parser()); });
     const std::string name = std::filesystem::path(recording.name()).filename().string();
     return {{"schema", "zulm.view"},           {"schema_version", 1},
@@ -43,7 +43,7 @@ std::string relativeAddress(const std::string& file, const std::string& folder) 
     return address;
 }
 
-std::string embeddedAddress(const Recording& recording) {
+std::string embeddedAddress(const RecordingFile& recording) {
     const bool isWave = recording.container() == Container::Riff;
     return fmt::format("data:{};base64,", isWave ? "audio/wav" : "video/mp4");
 }

@@ -2,7 +2,7 @@
 
 // The page of the viewer with a recording inside.
 
-#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 
 #include <nlohmann/json.hpp>
 
@@ -16,13 +16,13 @@ std::string_view builtInPage();
 
 /// What a page holds of a recording, {"schema": "zulm.view", ...}: its metadata as the bytes of a small file, and what
 /// `info` and `verify` tell. `movie` is the address that the page finds the movie at, or null. Throws `FileError`.
-nlohmann::ordered_json viewDocument(ZULMetaData::Recording& recording, const nlohmann::ordered_json& movie);
+nlohmann::ordered_json viewDocument(ZULMetaData::RecordingFile& recording, const nlohmann::ordered_json& movie);
 
 /// The address of `file` for a page in `folder`: relative, in percent encoding.
 std::string relativeAddress(const std::string& file, const std::string& folder);
 
 /// What the address of a movie that is inside the page begins with; the movie in base64 follows.
-std::string embeddedAddress(const ZULMetaData::Recording& recording);
+std::string embeddedAddress(const ZULMetaData::RecordingFile& recording);
 
 /// As the text of a script element: no character ends the element.
 std::string scriptText(const nlohmann::ordered_json& document);

@@ -49,10 +49,18 @@ inline constexpr std::tuple s_pointFields{Field{"x", &Point::x},
 inline constexpr std::tuple s_rectFields{Field{"x", &Rect::x}, Field{"y", &Rect::y}, Field{"width", &Rect::width},
                                          Field{"height", &Rect::height}};
 
+/// What becomes of an entry when the movie is cut.
+enum class StreamRole {
+    State, ///< holds until the next entry, so it is carried over a cut
+    Event, ///< happens at its time, and is never repeated
+    Once,  ///< is valid for the whole recording, whatever its time
+};
+
 /// What all kinds have. A kind adds `fields`.
-template <StreamValue T, const uuid& identifier>
+template <StreamValue T, const uuid& identifier, StreamRole streamRole = StreamRole::State>
 struct StreamKind {
     using Value = T;                                        ///< the type of the values in the stream
+    static constexpr StreamRole role = streamRole;          ///< what becomes of its entries when the movie is cut
     static constexpr uuid type = identifier;                ///< the identifier in the header of the stream
     static constexpr int version = detail::versionOf(type); ///< the version that is written; earlier ones are read too
 };
@@ -68,12 +76,12 @@ struct HoverRectKind : StreamKind<Rect, s_hoverRectUUID> {
 };
 
 /// The recorded region.
-struct RecordingRegionKind : StreamKind<Rect, s_recordingRegionUUID> {
+struct RecordingRegionKind : StreamKind<Rect, s_recordingRegionUUID, StreamRole::Once> {
     static constexpr auto fields = s_rectFields;
 };
 
 /// Scroll deltas.
-struct ScrollActionKind : StreamKind<Point, s_scrollActionUUID> {
+struct ScrollActionKind : StreamKind<Point, s_scrollActionUUID, StreamRole::Event> {
     static constexpr auto fields = s_pointFields;
 };
 
@@ -93,7 +101,7 @@ struct CursorOpacityKind : StreamKind<double, s_cursorOpacityUUID> {
 };
 
 /// The display's scale factor.
-struct ScaleFactorKind : StreamKind<std::int32_t, s_recordingScaleFactorUUID> {
+struct ScaleFactorKind : StreamKind<std::int32_t, s_recordingScaleFactorUUID, StreamRole::Once> {
     static constexpr std::tuple fields{Field{"scaleFactor", wholeValue}};
 };
 
@@ -133,7 +141,7 @@ struct CursorImageKind : StreamKind<CursorImage, s_cursorImageUUID> {
 };
 
 /// Buttons and modifiers.
-struct CursorActionKind : StreamKind<std::int32_t, s_cursorActionUUID> {
+struct CursorActionKind : StreamKind<std::int32_t, s_cursorActionUUID, StreamRole::Event> {
     static constexpr std::tuple fields{Field{"action", HumanReadableActions::CursorActionToString},
                                        Field{"rawActionValue", wholeValue}};
 };
@@ -149,7 +157,7 @@ inline std::string keyModifiersText(const KeyStroke& key) {
 }
 
 /// Keys and modifiers.
-struct KeyboardActionKind : StreamKind<KeyStroke, s_keyboardActionUUID> {
+struct KeyboardActionKind : StreamKind<KeyStroke, s_keyboardActionUUID, StreamRole::Event> {
     static constexpr std::tuple fields{
         Field{"characterCode", &KeyStroke::characterCode}, Field{"characterString", keyText},
         Field{"eventFlagsCode", &KeyStroke::eventFlagsCode}, Field{"eventFlagsString", keyModifiersText}};
@@ -164,7 +172,7 @@ std::string systemText(const std::list<std::string>& texts) {
 }
 
 /// The machine.
-struct SystemDataKind : StreamKind<std::list<std::string>, s_systemDataUUID> {
+struct SystemDataKind : StreamKind<std::list<std::string>, s_systemDataUUID, StreamRole::Once> {
     static constexpr std::tuple fields{Field{"processorCount", systemText<0>},
                                        Field{"activeProcessorCount", systemText<1>}, Field{"osVersion", systemText<2>},
                                        Field{"ram", systemText<3>}};

@@ -38,7 +38,7 @@ bool isMovable(const ContainerItem& item) {
 
 } // namespace
 
-RecordingCompaction::RecordingCompaction(Recording& recording, KeptMetaData kept)
+RecordingCompaction::RecordingCompaction(RecordingFile& recording, KeptMetaData kept)
     : recording_(recording), kept_(kept), items_(topLevelItems(recording.bytes(), recording.container())) {
     if (recording_.container() == Container::RawStream)
         throw CompactionError(Obstacle::NoContainer, "is a stream alone, without a movie around it");
@@ -152,7 +152,7 @@ ByteSource RecordingCompaction::wholePartOf(const StreamInfo& stream) const {
 
 /// Reads the copy back: its readers must find the same streams with the same bytes.
 void RecordingCompaction::verify(const FileLocation& copy) const {
-    const Recording written(copy);
+    const RecordingFile written(copy);
     const std::vector<StreamInfo> found = written.streams();
     bool isSame = found.size() == streams_.size();
     for (std::size_t i = 0; isSame && i < found.size(); ++i)

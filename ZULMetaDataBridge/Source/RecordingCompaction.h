@@ -3,7 +3,7 @@
 // Writes a recording anew with less metadata: without the streams that later ones hide, or without any. The media is
 // copied as it is and stays in its place.
 //
-//     Recording recording("Recording.mp4");
+//     RecordingFile recording("Recording.mp4");
 //     RecordingCompaction compaction(recording, KeptMetaData::Newest);
 //     // copy the first compaction.copiedBytes() bytes of the recording to "Smaller.mp4", then:
 //     compaction.complete("Smaller.mp4");
@@ -11,7 +11,7 @@
 #include "../../Platform/FileLocation.h"
 #include "../../SharedDependencies/Export.h"
 #include "../../ZULMetaData/Containers/ContainerLayout.h"
-#include "Recording.h"
+#include "RecordingFile.h"
 
 #include <cstdint>
 #include <ostream>
@@ -50,7 +50,7 @@ private:
 class ZULMETADATA_API RecordingCompaction {
 public:
     /// Throws `CompactionError`, and `FileError` if the recording cannot be read. `recording` must outlive this.
-    RecordingCompaction(Recording& recording, KeptMetaData kept);
+    RecordingCompaction(RecordingFile& recording, KeptMetaData kept);
 
     /// Returns how many bytes the copy shares with the recording before its metadata begins. The caller copies them, so
     /// that it can keep the holes of a sparse file and show its progress.
@@ -77,7 +77,7 @@ private:
     ByteSource wholePartOf(const StreamInfo& stream) const;
     void verify(const FileLocation& copy) const;
 
-    Recording& recording_;
+    RecordingFile& recording_;
     KeptMetaData kept_;
     std::vector<ContainerItem> items_;    ///< at the top level
     std::size_t tail_ = 0;                ///< the first item of the tail

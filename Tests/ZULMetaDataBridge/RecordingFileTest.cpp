@@ -1,4 +1,4 @@
-#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 
 #include "Tests/Support/Files.h"
 #include "Tests/Support/InvalidCorpus.h"
@@ -33,7 +33,7 @@ public:
     explicit Opened(const std::string& bytes, const std::string& name = "Recording.mp4")
         : bytes_(bytes), recording_(ByteSource::memory(bytes_), name) {}
 
-    Recording* operator->() { return &recording_; }
+    RecordingFile* operator->() { return &recording_; }
 
     /// The positions in the stream: time, x, y.
     template <class Stream>
@@ -48,7 +48,7 @@ public:
 
 private:
     std::string bytes_;
-    Recording recording_;
+    RecordingFile recording_;
 };
 
 template <class Error, class Work>
@@ -61,7 +61,7 @@ std::string errorOf(Work work) {
     return "nothing was thrown";
 }
 
-TEST(Recording, FindsTheStreamsOfAMovie) {
+TEST(RecordingFile, FindsTheStreamsOfAMovie) {
     Opened recording(movie(extendedAtom("DATA", locationStream()) + extendedAtom("DATA", appNameStream())));
     EXPECT_STREQ(containerName(recording->container()), "movie");
     const std::vector<StreamInfo> streams = recording->streams();
@@ -74,35 +74,37 @@ TEST(Recording, FindsTheStreamsOfAMovie) {
     EXPECT_THAT(recording.positionsIn(streams[1]), ElementsAre(std::tuple(0.5, 10, 20), std::tuple(1.0, -3, 7)));
 }
 
-TEST(Recording, CallsAFileByItsPathUnlessItHasAnotherName) {
+TEST(RecordingFile, CallsAFileByItsPathUnlessItHasAnotherName) {
     const TemporaryFolder folder;
     writeFile(folder / "a.dat", locationStream());
-    Recording recording(folder / "a.dat");
+    RecordingFile recording(folder / "a.dat");
     EXPECT_EQ(recording.path(), folder / "a.dat");
     EXPECT_EQ(recording.name(), folder / "a.dat");
     EXPECT_STREQ(containerName(recording.container()), "stream");
     EXPECT_EQ(recording.size(), locationStream().size());
-    EXPECT_EQ(Recording(folder / "a.dat", "-").name(), "-");
+    EXPECT_EQ(RecordingFile(folder / "a.dat", "-").name(), "-");
 }
 
-TEST(Recording, SaysWhichFileCannotBeOpened) {
+TEST(RecordingFile, SaysWhichFileCannotBeOpened) {
     const TemporaryFolder folder;
     const std::string missing = folder / "missing.mp4";
-    EXPECT_EQ(errorOf<FileError>([&] { Recording{missing}; }),
+    EXPECT_EQ(errorOf<FileError>([&] { RecordingFile{missing}; }),
               missing + ": cannot be opened: No such file or directory");
-    EXPECT_THAT(errorOf<FileError>([&] { Recording(missing, "-"); }), StartsWith("-: cannot be opened: "));
-    EXPECT_EQ(errorOf<std::system_error>([&] { Recording{missing}; }), errorOf<FileError>([&] { Recording{missing}; }));
+    EXPECT_THAT(errorOf<FileError>([&] { RecordingFile(missing, "-"); }), StartsWith("-: cannot be opened: "));
+    EXPECT_EQ(errorOf<std::system_error>([&] { RecordingFile{missing}; }),
+              errorOf<FileError>([&] { RecordingFile{missing}; }));
 }
 
-TEST(Recording, RefusesAFileThatCanHoldNoMetaData) {
+TEST(RecordingFile, RefusesAFileThatCanHoldNoMetaData) {
     const TemporaryFolder folder;
     writeFile(folder / "notes.txt", std::string(100, '\0'));
     const std::string refusal = ": begins neither like a movie, nor a RIFF file, nor a stream";
-    EXPECT_EQ(errorOf<std::runtime_error>([&] { Recording{folder / "notes.txt"}; }), folder / "notes.txt" + refusal);
+    EXPECT_EQ(errorOf<std::runtime_error>([&] { RecordingFile{folder / "notes.txt"}; }),
+              folder / "notes.txt" + refusal);
     EXPECT_EQ(errorOf<std::runtime_error>([] { Opened(std::string(100, '\0'), "notes.txt"); }), "notes.txt" + refusal);
 }
 
-TEST(Recording, KnowsHowMuchOfAStreamTheFileHolds) {
+TEST(RecordingFile, KnowsHowMuchOfAStreamTheFileHolds) {
     const std::string whole = movie(extendedAtom("DATA", locationStream()));
     Opened recording(whole.substr(0, whole.size() - 20));
     const StreamInfo stream = recording->streams().at(0);
@@ -111,7 +113,7 @@ TEST(Recording, KnowsHowMuchOfAStreamTheFileHolds) {
     EXPECT_THAT(recording.positionsIn(stream), testing::IsEmpty());
 }
 
-TEST(Recording, ExaminesAStream) {
+TEST(RecordingFile, ExaminesAStream) {
     Opened recording(movie(extendedAtom("DATA", locationStream())));
     const StreamReport report = recording->examine(recording->streams().at(0));
     EXPECT_TRUE(isDecodable(report.header()));
@@ -122,7 +124,7 @@ TEST(Recording, ExaminesAStream) {
     EXPECT_FALSE(recording->validation().isDamaged());
 }
 
-TEST(Recording, HasNothingReadableInAStreamWithoutAHeader) {
+TEST(RecordingFile, HasNothingReadableInAStreamWithoutAHeader) {
     Opened recording(movie(extendedAtom("DATA", locationStream().substr(0, 20))));
     for (const StreamReport& report : recording->examinedStreams()) {
         EXPECT_EQ(report.readableBytes, 0U);
@@ -131,7 +133,7 @@ TEST(Recording, HasNothingReadableInAStreamWithoutAHeader) {
     }
 }
 
-TEST(Recording, ListsWhatALaterStreamOfTheKindHides) {
+TEST(RecordingFile, ListsWhatALaterStreamOfTheKindHides) {
     const std::string later = streamHeader(s_cursorLocations, 1, 16) + pointEntry(1, 8, 9);
     Opened recording(movie(extendedAtom("DATA", locationStream()) + extendedAtom("DATA", later)));
     EXPECT_THAT(recording.positionsIn(recording->streams().at(0)), ElementsAre(std::tuple(1.0, 8, 9)));
@@ -140,7 +142,7 @@ TEST(Recording, ListsWhatALaterStreamOfTheKindHides) {
     EXPECT_EQ(recording.positionsIn(hidden[0]).size(), 2U);
 }
 
-TEST(Recording, EndsWhereItIsToldTo) {
+TEST(RecordingFile, EndsWhereItIsToldTo) {
     Opened recording(locationStream(), "a.dat");
     int count = 0;
     const std::uint64_t bytes =
@@ -149,7 +151,7 @@ TEST(Recording, EndsWhereItIsToldTo) {
     EXPECT_EQ(bytes, 24U + 16);
 }
 
-TEST(Recording, EndsBeforeAnEntryThatDoesNotFitItsKind) {
+TEST(RecordingFile, EndsBeforeAnEntryThatDoesNotFitItsKind) {
     const std::string list = le32(4 + 13) + le32(1) + textEntry(7, "a");
     const std::string wrong = le32(4 + 13) + le32(2) + textEntry(7, "a");
     Opened recording(streamHeader("2b7b6afc", 1, 0) + list + wrong + list, "a.dat");
@@ -164,15 +166,15 @@ TEST(Recording, EndsBeforeAnEntryThatDoesNotFitItsKind) {
     EXPECT_EQ(bytes, 24U + list.size());
 }
 
-TEST(Recording, DoesNotDecodeAnotherVersion) {
+TEST(RecordingFile, DoesNotDecodeAnotherVersion) {
     Opened recording(streamHeader(s_cursorLocations, 9, 16) + pointEntry(1, 2, 3), "a.dat");
     EXPECT_THAT(recording.positionsIn(recording->streams().at(0)), testing::IsEmpty());
     EXPECT_EQ(recording->entriesOf(recording->streams().at(0)).header()->version, 9);
 }
 
-TEST(Recording, DeliversWhatReadersDeliverOfEveryDamagedFile) {
+TEST(RecordingFile, DeliversWhatReadersDeliverOfEveryDamagedFile) {
     for (const InvalidFile& file : invalidCorpus()) {
-        Recording recording(file.path);
+        RecordingFile recording(file.path);
         for (const StreamReport& stream : recording.examinedStreams())
             RecordedKinds::visit(stream.type, [&]<class Kind>() {
                 using Value = typename Kind::Value;

@@ -1,4 +1,4 @@
-#include "ZULMetaDataBridge/Source/Recording.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 
 #include "ZULMetaData/ByteSourceStream.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
@@ -34,32 +34,34 @@ Container::Type recognizedType(const ByteSource& bytes, const std::string& name)
 
 } // namespace
 
-Recording::Recording(const FileLocation& file, std::string name) : Recording(utf8Path(file), std::move(name), {}) {}
+RecordingFile::RecordingFile(const FileLocation& file, std::string name)
+    : RecordingFile(utf8Path(file), std::move(name), {}) {}
 
-Recording::Recording(ByteSource bytes, std::string name) : Recording({}, std::move(name), std::move(bytes)) {}
+RecordingFile::RecordingFile(ByteSource bytes, std::string name)
+    : RecordingFile({}, std::move(name), std::move(bytes)) {}
 
-Recording::Recording(std::string path, std::string name, std::optional<ByteSource> bytes)
+RecordingFile::RecordingFile(std::string path, std::string name, std::optional<ByteSource> bytes)
     : path_(std::move(path)), name_(name.empty() ? path_ : std::move(name)),
       bytes_(bytes ? namedSource(*bytes, name_) : openSource(path_, name_)),
       input_(std::make_unique<ByteSourceStream>(bytes_)), parser_(opened(name_, [this] {
           return openContainer(*input_, recognizedType(bytes_, path_.empty() ? name_ : path_));
       })) {}
 
-std::optional<double> Recording::duration() const {
+std::optional<double> RecordingFile::duration() const {
     return movieDuration(bytes_, container());
 }
 
-std::vector<ZCAPHeader> Recording::creators() const {
+std::vector<ZCAPHeader> RecordingFile::creators() const {
     return readRecordingInfo(bytes_, container());
 }
 
-const ValidationReport& Recording::validation() {
+const ValidationReport& RecordingFile::validation() {
     if (!validation_)
         validation_ = validateRecording(bytes_, container());
     return *validation_;
 }
 
-std::vector<StreamInfo> Recording::streams() const {
+std::vector<StreamInfo> RecordingFile::streams() const {
     std::vector<StreamInfo> streams;
     for (const uuid& type : parser_->getAvailableMetaDataUUIDs()) {
         const auto [offset, length] = parser_->fileDataForUUID(type);
@@ -68,7 +70,7 @@ std::vector<StreamInfo> Recording::streams() const {
     return streams;
 }
 
-StreamReport Recording::examine(const StreamInfo& stream) {
+StreamReport RecordingFile::examine(const StreamInfo& stream) {
     const std::vector<StreamReport>& reports = validation().streams;
     const auto found = std::find_if(reports.begin(), reports.end(),
                                     [&](const StreamReport& report) { return report.offset == stream.offset; });
@@ -80,14 +82,14 @@ StreamReport Recording::examine(const StreamInfo& stream) {
     return report;
 }
 
-std::vector<StreamReport> Recording::examinedStreams() {
+std::vector<StreamReport> RecordingFile::examinedStreams() {
     std::vector<StreamReport> reports;
     for (const StreamInfo& stream : streams())
         reports.push_back(examine(stream));
     return reports;
 }
 
-std::vector<StreamReport> Recording::hiddenStreams() {
+std::vector<StreamReport> RecordingFile::hiddenStreams() {
     std::vector<StreamReport> hidden;
     for (const StreamReport& stream : validation().streams) {
         const auto [offset, length] = parser_->fileDataForUUID(stream.type);

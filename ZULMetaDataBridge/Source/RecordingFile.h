@@ -2,7 +2,7 @@
 
 // A movie, RIFF file or stream file that is opened to look into it: its streams, their entries, and what is wrong.
 //
-//     Recording recording("Recording.mp4");
+//     RecordingFile recording("Recording.mp4");
 //     for (const StreamInfo& stream : recording.streams())
 //         std::cout << stream.name() << ": " << recording.examine(stream).wholeEntries << " entries\n";
 
@@ -44,15 +44,15 @@ struct StreamInfo {
 
 /// Finds the streams once, when it is created, and then reads from the places that it found. Calls must not overlap.
 /// Functions that read throw `FileError` if that fails.
-class ZULMETADATA_API Recording {
+class ZULMETADATA_API RecordingFile {
 public:
     /// Opens a file, and takes it for what `recognizeContainer` says. Errors call it `name`, or by its path if `name`
     /// is empty. Throws `FileError` if the file cannot be opened or read, and `std::runtime_error` with the refusal if
     /// it can hold no metadata.
-    explicit Recording(const FileLocation& file, std::string name = {});
+    explicit RecordingFile(const FileLocation& file, std::string name = {});
 
     /// The same for bytes of the caller.
-    Recording(ByteSource bytes, std::string name);
+    RecordingFile(ByteSource bytes, std::string name);
 
     const std::string& path() const { return path_; } ///< the file's path; empty for bytes of the caller
     const std::string& name() const { return name_; } ///< what errors call it
@@ -97,7 +97,7 @@ public:
     }
 
 private:
-    Recording(std::string path, std::string name, std::optional<ByteSource> bytes);
+    RecordingFile(std::string path, std::string name, std::optional<ByteSource> bytes);
 
     std::string path_;
     std::string name_;
@@ -110,7 +110,7 @@ private:
 // ---------------------------------------------------------------------------------------------------------------
 
 template <StreamValue Value, class Visit>
-std::uint64_t Recording::readEntries(const StreamInfo& stream, Visit visit) const {
+std::uint64_t RecordingFile::readEntries(const StreamInfo& stream, Visit visit) const {
     StreamEntries entries = entriesOf(stream);
     if (!entries.header() || !isDecodable(*entries.header()))
         return 0;
