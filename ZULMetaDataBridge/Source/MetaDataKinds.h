@@ -183,6 +183,10 @@ template <class... Kinds>
 struct KindList {
     static constexpr std::size_t size = sizeof...(Kinds); ///< the number of kinds
 
+    /// Whether the list has this kind.
+    template <class Kind>
+    static constexpr bool contains = (std::is_same_v<Kind, Kinds> || ...);
+
     /// Calls `visit.template operator()<Kind>()` for every kind.
     template <class Visit>
     static constexpr void forEach(Visit&& visit) {

@@ -1,0 +1,31 @@
+#pragma once
+
+#include "../SharedDependencies/Export.h"
+
+#include <cstdint>
+#include <optional>
+#include <stdexcept>
+#include <string>
+
+namespace ZULMetaData {
+
+/// The one way in which the session layer reports a failure.
+class ZULMETADATA_API Error : public std::runtime_error {
+public:
+    /// `what()` joins them, as in "a.mp4: at 1200: an entry of cursorLocation is cut short". `file` may be empty.
+    Error(const std::string& file, const std::string& sentence, std::optional<std::uint64_t> offset = std::nullopt)
+        : std::runtime_error((file.empty() ? "" : file + ": ") +
+                             (offset ? "at " + std::to_string(*offset) + ": " : "") + sentence),
+          file_(file), sentence_(sentence), offset_(offset) {}
+
+    const std::string& file() const { return file_; }               ///< the file's name as the caller uses it, or empty
+    const std::string& sentence() const { return sentence_; }       ///< what happened
+    std::optional<std::uint64_t> offset() const { return offset_; } ///< the position in the file, if there is one
+
+private:
+    std::string file_;
+    std::string sentence_;
+    std::optional<std::uint64_t> offset_;
+};
+
+} // namespace ZULMetaData

@@ -1,0 +1,130 @@
+#pragma once
+
+// The entries of one kind in the order of their times.
+//
+//     const Track<CursorLocationKind> positions = recording.track<CursorLocationKind>();
+//     if (const Point* position = positions.at(12.5))
+//         std::cout << *position << '\n';
+
+#include "TrackValues.h"
+
+#include <algorithm>
+#include <cassert>
+#include <cmath>
+#include <cstddef>
+#include <cstdint>
+#include <memory>
+#include <numeric>
+#include <optional>
+#include <span>
+#include <utility>
+#include <vector>
+
+namespace ZULMetaData {
+
+/// A kind of metadata that can be recorded and read.
+template <class Kind>
+concept RecordedKind = RecordedKinds::contains<Kind>;
+
+/// Columns of times and values, immutable. Copies share them, and any number of threads may read them.
+template <RecordedKind Kind>
+class Track {
+public:
+    using Value = TrackValueOf<Kind>; ///< the type of its values
+
+    /// Entries that follow one another in a track.
+    struct Part {
+        std::span<const double> times; ///< in seconds, ascending
+        std::span<const Value> values; ///< as many
+
+        std::size_t size() const { return times.size(); } ///< returns the number of entries
+        bool empty() const { return times.empty(); }      ///< returns true if there are none
+    };
+
+    Track() = default; ///< creates an empty track
+
+    /// Takes columns of equal length in the order of the stream. Entries whose time is not finite are left out; the
+    /// others are ordered by time, and equal times keep their order.
+    Track(std::vector<double> times, std::vector<Value> values);
+
+    std::size_t size() const { return whole().size(); }              ///< returns the number of entries
+    bool empty() const { return whole().empty(); }                   ///< returns true if there are none
+    std::span<const double> times() const { return whole().times; }  ///< in seconds, ascending and finite
+    std::span<const Value> values() const { return whole().values; } ///< as many as `times`
+
+    /// Returns how many entries of the stream are not in the track because their time is not finite.
+    std::size_t leftOut() const { return columns_ ? columns_->leftOut : 0; }
+
+    /// Returns how many entries have a time at or before `time`. The last of them holds then.
+    std::size_t countUntil(double time) const {
+        return static_cast<std::size_t>(std::upper_bound(times().begin(), times().end(), time) - times().begin());
+    }
+
+    /// Returns the value of the last entry at or before `time`, or null before the first.
+    const Value* at(double time) const {
+        const std::size_t count = countUntil(time);
+        return count == 0 ? nullptr : &values()[count - 1];
+    }
+
+    /// Returns the entries with `from` <= time < `to`.
+    Part between(double from, double to) const {
+        const auto begin = std::lower_bound(times().begin(), times().end(), from);
+        const auto end = std::lower_bound(begin, times().end(), std::max(from, to));
+        const auto first = static_cast<std::size_t>(begin - times().begin());
+        const auto count = static_cast<std::size_t>(end - begin);
+        return {times().subspan(first, count), values().subspan(first, count)};
+    }
+
+private:
+    struct Columns {
+        std::vector<double> times;
+        std::vector<Value> values;
+        std::size_t leftOut = 0;
+    };
+
+    Part whole() const { return columns_ ? Part{columns_->times, columns_->values} : Part(); }
+
+    std::shared_ptr<const Columns> columns_;
+};
+
+// ---------------------------------------------------------------------------------------------------------------
+
+namespace detail {
+
+/// Returns whether the times ascend and are finite.
+inline bool areInOrder(std::span<const double> times) {
+    return std::is_sorted(times.begin(), times.end()) &&
+           std::all_of(times.begin(), times.end(), [](double time) { return std::isfinite(time); });
+}
+
+/// Returns the numbers of the entries with a finite time, ordered by time.
+inline std::vector<std::size_t> orderOf(std::span<const double> times) {
+    std::vector<std::size_t> order(times.size());
+    std::iota(order.begin(), order.end(), std::size_t{0});
+    std::erase_if(order, [times](std::size_t entry) { return !std::isfinite(times[entry]); });
+    std::stable_sort(order.begin(), order.end(),
+                     [times](std::size_t left, std::size_t right) { return times[left] < times[right]; });
+    return order;
+}
+
+} // namespace detail
+
+template <RecordedKind Kind>
+Track<Kind>::Track(std::vector<double> times, std::vector<Value> values) {
+    assert(times.size() == values.size());
+    auto columns = std::make_shared<Columns>();
+    if (detail::areInOrder(times)) {
+        columns->times = std::move(times);
+        columns->values = std::move(values);
+    } else {
+        const std::vector<std::size_t> order = detail::orderOf(times);
+        columns->leftOut = times.size() - order.size();
+        for (const std::size_t entry : order) {
+            columns->times.push_back(times[entry]);
+            columns->values.push_back(std::move(values[entry]));
+        }
+    }
+    columns_ = std::move(columns);
+}
+
+} // namespace ZULMetaData
