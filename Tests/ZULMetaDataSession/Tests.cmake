@@ -1,0 +1,3 @@
+zulm_add_tests(ZULMetaDataSessionTests
+  TrackTest)
+target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session)

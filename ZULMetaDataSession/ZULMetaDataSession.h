@@ -1,0 +1,10 @@
+#pragma once
+
+// Includes everything with which recorders and editors are written.
+
+#include "EditList.h"
+#include "Error.h"
+#include "Rational.h"
+#include "Recording.h"
+#include "Track.h"
+#include "TrackValues.h"
