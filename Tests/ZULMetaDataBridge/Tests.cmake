@@ -13,8 +13,8 @@ zulm_add_tests(ZULMetaDataBridgeTests
   MetaDataExcerptTest
   ParserFamilyTest
   RecordingCompactionTest
+  RecordingFileTest
   RecordingRedactionTest
-  RecordingTest
   SafeMovieSaveTest
   StreamRedactionTest
   StreamRetimingTest
