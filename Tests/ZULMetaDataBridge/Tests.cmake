@@ -5,6 +5,7 @@ zulm_add_tests(ZULMetaDataBridgeTests
   EntryDictionaryTest
   EntryTextsTest
   HumanReadableActionsTest
+  InputVocabularyTest
   Validation/InvalidCorpusTest
   KeyCaptionsTest
   KeyNamesTest
@@ -13,8 +14,8 @@ zulm_add_tests(ZULMetaDataBridgeTests
   MetaDataExcerptTest
   ParserFamilyTest
   RecordingCompactionTest
+  RecordingFileTest
   RecordingRedactionTest
-  RecordingTest
   SafeMovieSaveTest
   StreamRedactionTest
   StreamRetimingTest
