@@ -6,5 +6,6 @@
 #include "Error.h"
 #include "Rational.h"
 #include "Recording.h"
+#include "Retiming.h"
 #include "Track.h"
 #include "TrackValues.h"

@@ -1,5 +1,8 @@
 zulm_add_tests(ZULMetaDataSessionTests
   EditListTest
+  PieceClockTest
   RationalTest
+  RecordingTest
+  RetimingTest
   TrackTest)
-target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session)
+target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)
