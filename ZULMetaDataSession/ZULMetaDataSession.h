@@ -4,7 +4,10 @@
 
 #include "EditList.h"
 #include "Error.h"
+#include "Picture.h"
 #include "Rational.h"
 #include "Recording.h"
+#include "Snapshot.h"
+#include "Timeline.h"
 #include "Track.h"
 #include "TrackValues.h"
