@@ -111,7 +111,7 @@ struct TracksOf<KindList<Kinds...>> {
     template <class Kind>
     static constexpr std::size_t placeOf() {
         std::size_t place = 0;
-        ((std::is_same_v<Kind, Kinds> ? true : (++place, false)) || ...);
+        static_cast<void>(((std::is_same_v<Kind, Kinds> ? true : (++place, false)) || ...));
         return place;
     }
 };
