@@ -1,2 +1,10 @@
-zulm_add_tests(ZULMetaDataSessionTests RecordingTest TrackTest)
-    target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)
+zulm_add_tests(ZULMetaDataSessionTests
+  EditListTest
+  PictureTest
+  RationalTest
+  RecordingTest
+  SnapshotTest
+  TimeIndexTest
+  TimelineTest
+  TrackTest)
+target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)
