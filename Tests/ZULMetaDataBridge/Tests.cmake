@@ -5,6 +5,7 @@ zulm_add_tests(ZULMetaDataBridgeTests
   EntryDictionaryTest
   EntryTextsTest
   HumanReadableActionsTest
+  InputVocabularyTest
   Validation/InvalidCorpusTest
   KeyCaptionsTest
   KeyNamesTest
