@@ -1,2 +1,6 @@
-zulm_add_tests(ZULMetaDataSessionTests RecordingTest TrackTest)
-    target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)
+zulm_add_tests(ZULMetaDataSessionTests
+  EditListTest
+  RationalTest
+  RecordingTest
+  TrackTest)
+target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)
