@@ -4,6 +4,7 @@
 
 #include "EditList.h"
 #include "Error.h"
+#include "Insights/Clicks.h"
 #include "Rational.h"
 #include "Recording.h"
 #include "Track.h"
