@@ -39,6 +39,17 @@ inline Track<CursorActionKind> actions(const std::vector<std::pair<double, std::
     return {std::move(times), std::move(values)};
 }
 
+/// Keys as they are stored.
+inline Track<KeyboardActionKind> keys(const std::vector<std::pair<double, KeyStroke>>& entries) {
+    std::vector<double> times;
+    std::vector<KeyInput> values;
+    for (const auto& [time, stored] : entries) {
+        times.push_back(time);
+        values.push_back(keyInputOf(stored));
+    }
+    return {std::move(times), std::move(values)};
+}
+
 /// Numbers that look random and are the same everywhere.
 class Numbers {
 public:
