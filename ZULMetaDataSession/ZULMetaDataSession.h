@@ -5,6 +5,7 @@
 #include "EditList.h"
 #include "Error.h"
 #include "Insights/Clicks.h"
+#include "Insights/Idle.h"
 #include "Insights/KeyCaptions.h"
 #include "Rational.h"
 #include "Recording.h"

@@ -1,5 +1,6 @@
 zulm_add_tests(ZULMetaDataSessionTests
   Insights/ClicksTest
+  Insights/IdleTest
   Insights/KeyCaptionsTest
   TrackTest)
 target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session)
