@@ -1,4 +1,5 @@
 zulm_add_tests(ZULMetaDataSessionTests
+  Insights/ChaptersTest
   Insights/ClicksTest
   Insights/IdleTest
   Insights/KeyCaptionsTest
