@@ -3,5 +3,6 @@ zulm_add_tests(ZULMetaDataSessionTests
   Insights/ClicksTest
   Insights/IdleTest
   Insights/KeyCaptionsTest
+  RecordingTest
   TrackTest)
-target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session)
+target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)
