@@ -14,7 +14,6 @@
 #include "Source/FileError.h"
 #include "Source/HumanReadableActions.h"
 #include "Source/InputVocabulary.h"
-#include "Source/KeyCaptions.h"
 #include "Source/KeyNames.h"
 #include "Source/KindEntries.h"
 #include "Source/MetaDataExcerpt.h"
