@@ -120,14 +120,14 @@ constexpr ZulmColumnType columnType() {
 template <class Kind>
 void collect(const RecordingFile& recording, const StreamReport& stream, ZulmEntries& entries) {
     using Value = typename Kind::Value;
-    ZULMetaData::detail::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
+    ZULMetaData::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
         entries.columns.emplace_back(key, columnType<Stored>());
     });
     recording.readEntries<Value>(stream, [&entries](double time, const Value& value) {
         entries.times.push_back(time);
         auto column = entries.columns.begin();
-        ZULMetaData::detail::visitStoredFields<Kind>(
-            value, [&column](const char*, const auto& stored) { (column++)->add(stored); });
+        ZULMetaData::visitStoredFields<Kind>(value,
+                                             [&column](const char*, const auto& stored) { (column++)->add(stored); });
         return true;
     });
 }
