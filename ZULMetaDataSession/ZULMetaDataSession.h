@@ -4,6 +4,10 @@
 
 #include "EditList.h"
 #include "Error.h"
+#include "Insights/Chapters.h"
+#include "Insights/Clicks.h"
+#include "Insights/Idle.h"
+#include "Insights/KeyCaptions.h"
 #include "Picture.h"
 #include "Rational.h"
 #include "Recording.h"

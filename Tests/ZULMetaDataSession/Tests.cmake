@@ -1,5 +1,9 @@
 zulm_add_tests(ZULMetaDataSessionTests
   EditListTest
+  Insights/ChaptersTest
+  Insights/ClicksTest
+  Insights/IdleTest
+  Insights/KeyCaptionsTest
   PictureTest
   RationalTest
   RecordingTest
