@@ -7,9 +7,17 @@ zulm_add_tests(ZULMetaDataSessionTests
   EditLists/LosslessCutTest
   EditLists/MovieEditListTest
   EditLists/OpenTimelineTest
+  Insights/ChaptersTest
+  Insights/ClicksTest
+  Insights/IdleTest
+  Insights/KeyCaptionsTest
+  PictureTest
   PieceClockTest
   RationalTest
   RecordingTest
   RetimingTest
+  SnapshotTest
+  TimeIndexTest
+  TimelineTest
   TrackTest)
 target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)
