@@ -29,7 +29,9 @@ struct CommandGroup {
 const std::vector<CommandGroup> s_commandGroups{
     {"Look", {addInfoCommand, addAtomsCommand, addDumpCommand, addDiffCommand, addGrepCommand, addViewCommand}},
     {"Check and rescue", {addVerifyCommand, addRepairCommand, addSalvageCommand}},
-    {"Change", {addAttachCommand, addStampCommand, addRedactCommand, addCompactCommand, addDetachCommand}},
+    {"Change",
+     {addAttachCommand, addStampCommand, addRetimeCommand, addCutCommand, addRedactCommand, addCompactCommand,
+      addDetachCommand}},
     {"Convert", {addExtractCommand, addConvertCommand}},
     {"Try", {addDemoCommand}}};
 
