@@ -10,6 +10,10 @@ set_target_properties(AllocationShim PROPERTIES
   LIBRARY_OUTPUT_DIRECTORY ${CMAKE_CURRENT_BINARY_DIR}/Reliability PREFIX "")
 add_dependencies(reliability_programs AllocationShim)
 
+# Random edits against an oracle.
+zulm_add_reliability_program(random_edits random_edits.cpp)
+target_link_libraries(random_edits PRIVATE ZULMetaData::Session)
+
 # Threads, with the library under the thread sanitizer.
 zulm_add_sanitized_copy(threads_stream_core ZULMetaData thread)
 zulm_add_sanitized_copy(threads_bridge ZULMetaDataBridge thread)

@@ -29,6 +29,7 @@ CHECKS = {
     "sparse_movies": "movies around and far above 4 GiB",
     "fuzzing": "fuzzing of every input",
     "differential": "atom walks against other programs",
+    "random_edits": "random edits against an oracle",
     "valgrind": "the test suite under valgrind",
     "threads": "readers and writers on many threads",
     "mutation": "mutants of the stream core killed by the tests",

@@ -58,13 +58,18 @@ public:
 
     const EditList& edits() const { return edits_; }
 
-    /// Returns what differs between the library and the oracle; nothing if all is alike.
-    std::string difference() const {
+    /// Returns a movie with the recording.
+    std::string movie() const {
         std::vector<std::string> streams;
         for (const RandomStream& stream : streams_)
             streams.push_back(stream.bytesOf(stream.entries));
-        const std::string movie = media() + zulmAtom(streams);
-        const EditedRecording edited = retimed(Recording(ByteSource::memory(movie), "Random.mp4"), edits_);
+        return media() + zulmAtom(streams);
+    }
+
+    /// Returns what differs between the library and the oracle; nothing if all is alike.
+    std::string difference() const {
+        const std::string bytes = movie();
+        const EditedRecording edited = retimed(Recording(ByteSource::memory(bytes), "Random.mp4"), edits_);
         for (const RandomStream& stream : streams_)
             for (const EditedStream& made : edited.streams)
                 if (made.source.type == kind(stream.group))
