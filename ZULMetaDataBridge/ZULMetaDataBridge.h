@@ -13,6 +13,7 @@
 #include "Source/EntryTexts.h"
 #include "Source/FileError.h"
 #include "Source/HumanReadableActions.h"
+#include "Source/InputVocabulary.h"
 #include "Source/KeyCaptions.h"
 #include "Source/KeyNames.h"
 #include "Source/KindEntries.h"

@@ -5,6 +5,7 @@ zulm_add_tests(ZULMetaDataBridgeTests
   EntryDictionaryTest
   EntryTextsTest
   HumanReadableActionsTest
+  InputVocabularyTest
   Validation/InvalidCorpusTest
   KeyCaptionsTest
   KeyNamesTest
@@ -13,9 +14,10 @@ zulm_add_tests(ZULMetaDataBridgeTests
   MetaDataExcerptTest
   ParserFamilyTest
   RecordingCompactionTest
+  RecordingFileTest
   RecordingRedactionTest
-  RecordingTest
   SafeMovieSaveTest
+  StoredFieldsTest
   StreamRedactionTest
   StreamRetimingTest
   StreamSalvageTest

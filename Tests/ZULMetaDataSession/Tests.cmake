@@ -1,3 +1,2 @@
-zulm_add_tests(ZULMetaDataSessionTests
-  TrackTest)
-target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session)
+zulm_add_tests(ZULMetaDataSessionTests RecordingTest TrackTest)
+    target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)

@@ -57,6 +57,7 @@ ZULMETADATA_API RecognizedContainer recognizeContainer(const ByteSource& file, c
 ZULMETADATA_API std::unique_ptr<MetaDataParser> openContainer(const std::string& path);
 
 /// The same for a stream of the caller, which must outlive the parser. Throws `std::system_error` if reading fails.
-ZULMETADATA_API std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, Container::Type type);
+ZULMETADATA_API std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, Container::Type type,
+                                                              ScanMessages messages = ScanMessages::Printed);
 
 } // namespace ZULMetaData

@@ -1,7 +1,7 @@
 #include "ZULMetaDataBridge/Source/KeyCaptions.h"
 
 #include "SharedDependencies/UTF8.h"
-#include "ZULMetaDataBridge/Source/HumanReadableActions.h"
+#include "ZULMetaDataBridge/Source/InputVocabulary.h"
 #include "ZULMetaDataBridge/Source/KeyNames.h"
 
 #include <algorithm>
@@ -21,73 +21,72 @@ constexpr std::size_t s_lineLength = 42;
 
 constexpr auto s_mask = "\xe2\x80\xa2"; // bullet
 
-/// The library's names of the modifiers and their signs, in the order in which they are written before a key.
-constexpr std::array<std::pair<std::string_view, std::string_view>, 5> s_modifierSigns{{{"<Ctrl>", "\xe2\x8c\x83"},
-                                                                                        {"<Alt>", "\xe2\x8c\xa5"},
-                                                                                        {"<Win>", "\xe2\x8a\x9e"},
-                                                                                        {"<Shift>", "\xe2\x87\xa7"},
-                                                                                        {"<Cmd>", "\xe2\x8c\x98"}}};
+/// The signs of the modifiers, in the order in which they are written before a key.
+constexpr std::array<std::pair<Modifier, std::string_view>, 5> s_modifierSigns{{{Modifier::Control, "\xe2\x8c\x83"},
+                                                                                {Modifier::Alt, "\xe2\x8c\xa5"},
+                                                                                {Modifier::Windows, "\xe2\x8a\x9e"},
+                                                                                {Modifier::Shift, "\xe2\x87\xa7"},
+                                                                                {Modifier::Command, "\xe2\x8c\x98"}}};
 
-/// The modifiers of a key.
-class Modifiers {
-public:
-    explicit Modifiers(std::uint32_t flags)
-        : names_(HumanReadableActions::KeyboardModifiersToString(static_cast<std::int32_t>(flags))) {}
+bool makeShortcut(Modifiers modifiers) {
+    modifiers.erase(Modifier::Shift);
+    modifiers.erase(Modifier::CapsLock);
+    return !modifiers.empty();
+}
 
-    bool has(std::string_view name) const { return names_.find(name) != std::string::npos; }
-    bool makeShortcut() const { return has("<Ctrl>") || has("<Alt>") || has("<Win>") || has("<Cmd>"); }
-    bool makeUpperCase() const { return has("<Shift>") != has("<Alpha>"); }
+bool makeUpperCase(Modifiers modifiers) {
+    return modifiers.contains(Modifier::Shift) != modifiers.contains(Modifier::CapsLock);
+}
 
-    std::string signs() const {
-        std::string text;
-        for (const auto& [name, sign] : s_modifierSigns)
-            if (has(name))
-                text += sign;
-        return text;
-    }
+std::string signsOf(Modifiers modifiers) {
+    std::string text;
+    for (const auto& [modifier, sign] : s_modifierSigns)
+        if (modifiers.contains(modifier))
+            text += sign;
+    return text;
+}
 
-private:
-    std::string names_;
-};
-
-constexpr std::uint32_t s_space = 32;
 constexpr std::string_view s_shiftedDigits = ")!@#$%^&*(";
-constexpr std::uint32_t s_firstPunctuation = 187;
+
+/// What the keys from `VirtualKey::Plus` to `VirtualKey::Period` type.
 constexpr std::string_view s_punctuation = "+,-.";
 
 /// Returns what a virtual key with a name types; empty if it types nothing.
-std::string typedByVirtualKey(std::uint32_t code, const Modifiers& modifiers) {
-    if (code == s_space)
+std::string typedByVirtualKey(const KeyInput& key) {
+    constexpr auto firstPunctuation = static_cast<std::uint32_t>(VirtualKey::Plus);
+    const std::uint32_t code = key.code;
+    if (key.is(VirtualKey::Space))
         return " ";
     if (code >= '0' && code <= '9')
-        return std::string(1, modifiers.has("<Shift>") ? s_shiftedDigits[code - '0'] : static_cast<char>(code));
-    if (code >= s_firstPunctuation && code - s_firstPunctuation < s_punctuation.size())
-        return std::string(1, s_punctuation[code - s_firstPunctuation]);
+        return std::string(1, key.modifiers.contains(Modifier::Shift) ? s_shiftedDigits[code - '0']
+                                                                      : static_cast<char>(code));
+    if (code >= firstPunctuation && code - firstPunctuation < s_punctuation.size())
+        return std::string(1, s_punctuation[code - firstPunctuation]);
     if (code < 'A' || code > 'Z')
         return {};
-    const bool isUpperCase = modifiers.makeUpperCase() || modifiers.makeShortcut();
+    const bool isUpperCase = makeUpperCase(key.modifiers) || makeShortcut(key.modifiers);
     return std::string(1, static_cast<char>(isUpperCase ? code : code - 'A' + 'a'));
 }
 
 /// Returns what a key types; empty for a special key. A number may stand for any character.
-std::string typedBy(const KeyStroke& key, const KeyName& name, const Modifiers& modifiers) {
+std::string typedBy(const KeyInput& key, const KeyName& name) {
     switch (name.meaning) {
     case KeyMeaning::Character: return name.text;
     case KeyMeaning::Number: return "[" + name.text + "]";
     case KeyMeaning::Key: break;
     }
-    return isVirtualKey(key) ? typedByVirtualKey(key.characterCode, modifiers) : std::string();
+    return key.isVirtualKey ? typedByVirtualKey(key) : std::string();
 }
 
 CaptionKey captionKey(const KeyEvent& event, bool showsKeys) {
-    const Modifiers modifiers(event.key.eventFlagsCode);
+    const KeyInput key = keyInputOf(event.key);
     const KeyName name = keyNameOf(event.key);
-    const std::string typed = typedBy(event.key, name, modifiers);
+    const std::string typed = typedBy(key, name);
     if (typed.empty())
-        return {event.time, modifiers.signs() + "[" + name.text + "]", false};
+        return {event.time, signsOf(key.modifiers) + "[" + name.text + "]", false};
     const std::string shown = showsKeys ? typed : s_mask;
-    if (modifiers.makeShortcut())
-        return {event.time, modifiers.signs() + shown, false};
+    if (makeShortcut(key.modifiers))
+        return {event.time, signsOf(key.modifiers) + shown, false};
     return {event.time, shown, true};
 }
 

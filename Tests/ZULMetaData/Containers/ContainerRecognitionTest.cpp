@@ -153,6 +153,23 @@ TEST(ContainerRecognition, ThrowsForWhatItCannotOpen) {
     EXPECT_THROW(openContainer(folder / "Zeros.mp4"), std::runtime_error);
 }
 
+TEST(ContainerRecognition, OmitsTheMessagesOfTheSearchIfItIsToldTo) {
+    const std::string child = chunk("JUNK", "junk") + chunk("DATA", locationStream());
+    for (const auto& [type, bytes] :
+         {std::pair(QuickTime,
+                    extendedAtom("ZULM", extendedAtom("free", "junk") + extendedAtom("DATA", locationStream()))),
+          std::pair(Riff, riffMedia() + chunk("ZULM", child))}) {
+        std::istringstream stream(bytes);
+        testing::internal::CaptureStderr();
+        const auto silent = streamsOf(*openContainer(stream, type, ScanMessages::Omitted));
+        EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+        testing::internal::CaptureStderr();
+        EXPECT_EQ(streamsOf(*openContainer(stream, type)), silent);
+        EXPECT_EQ(testing::internal::GetCapturedStderr().find("Found a non DATA "), 0U);
+        EXPECT_EQ(silent.size(), 1U);
+    }
+}
+
 TEST(ContainerRecognition, NamesTheExtensionThatTellsTheSame) {
     for (const auto type : {QuickTime, Riff, RawStream})
         EXPECT_EQ(MetaDataParser::streamTypeOf("file" + std::string(extensionFor(type))), type);
