@@ -37,7 +37,7 @@ using namespace ZULMetaData::Bindings;
 struct ZulmRecording {
     struct Stream {
         StreamReport report;
-        std::string kind; // or its identifier where it has none
+        std::string kind; // or its identifier if it has none
         std::string uuid;
         ZulmStream summary; // points into these texts
     };
@@ -71,7 +71,7 @@ std::string& lastError() {
     return message;
 }
 
-/// Keeps exceptions in. Null where `work` threw.
+/// Lets no exception out. Returns null if `work` throws.
 template <class Work>
 auto orNull(Work work) noexcept -> decltype(work()) {
     try {
