@@ -4,7 +4,9 @@ zulm_add_tests(ZULMetaDataSessionTests
   Insights/ClicksTest
   Insights/IdleTest
   Insights/KeyCaptionsTest
+  PieceClockTest
   RationalTest
   RecordingTest
+  RetimingTest
   TrackTest)
 target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)
