@@ -6,6 +6,7 @@
 #include "Error.h"
 #include "Insights/Chapters.h"
 #include "Insights/Clicks.h"
+#include "Insights/CursorPath.h"
 #include "Insights/Idle.h"
 #include "Insights/KeyCaptions.h"
 #include "Rational.h"

@@ -1,6 +1,7 @@
 zulm_add_tests(ZULMetaDataSessionTests
   Insights/ChaptersTest
   Insights/ClicksTest
+  Insights/CursorPathTest
   Insights/IdleTest
   Insights/KeyCaptionsTest
   RecordingTest
