@@ -9,6 +9,7 @@
 #include "Insights/CursorPath.h"
 #include "Insights/Idle.h"
 #include "Insights/KeyCaptions.h"
+#include "Insights/Zooms.h"
 #include "Rational.h"
 #include "Recording.h"
 #include "Track.h"

@@ -4,6 +4,7 @@ zulm_add_tests(ZULMetaDataSessionTests
   Insights/CursorPathTest
   Insights/IdleTest
   Insights/KeyCaptionsTest
+  Insights/ZoomsTest
   RecordingTest
   TrackTest)
 target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)
