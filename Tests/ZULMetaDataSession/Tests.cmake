@@ -2,8 +2,10 @@ zulm_add_tests(ZULMetaDataSessionTests
   EditListTest
   Insights/ChaptersTest
   Insights/ClicksTest
+  Insights/CursorPathTest
   Insights/IdleTest
   Insights/KeyCaptionsTest
+  Insights/ZoomsTest
   PieceClockTest
   RationalTest
   RecordingTest
