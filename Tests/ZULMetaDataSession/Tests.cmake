@@ -1,4 +1,5 @@
 zulm_add_tests(ZULMetaDataSessionTests
+  Insights/CameraTest
   Insights/ChaptersTest
   Insights/ClicksTest
   Insights/CursorPathTest
