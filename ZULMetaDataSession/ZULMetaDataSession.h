@@ -4,6 +4,7 @@
 
 #include "EditList.h"
 #include "Error.h"
+#include "Insights/Camera.h"
 #include "Insights/Chapters.h"
 #include "Insights/Clicks.h"
 #include "Insights/CursorPath.h"

@@ -1,5 +1,6 @@
 zulm_add_tests(ZULMetaDataSessionTests
   EditListTest
+  Insights/CameraTest
   Insights/ChaptersTest
   Insights/ClicksTest
   Insights/CursorPathTest

@@ -167,7 +167,7 @@ public:
         if (end - start < options_.least)
             return;
         const ScreenRect area = zoomedArea(screen_, scene.centre, factor_);
-        const ZoomPlace place{start, middleOf(area), area, scene.reason};
+        const ZoomPlace place{start, scene.first, middleOf(area), area, scene.reason};
         if (zooms_.empty() || start - zooms_.back().end >= std::max(0.0, options_.mergeGap))
             zooms_.push_back({start, end, factor_, {place}});
         else

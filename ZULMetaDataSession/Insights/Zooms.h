@@ -35,9 +35,10 @@ enum class ZoomReason : std::uint8_t { Clicks, Typing };
 
 /// A part of the screen that is worth a look.
 struct ZoomPlace {
-    double start = 0;   ///< when to go there, in seconds
-    ScreenPoint centre; ///< the middle of `area`
-    ScreenRect area;    ///< what is visible, in pixels of the recorded display; never beyond the edge of the screen
+    double start = 0;                       ///< when to go there, in seconds
+    double first = 0;                       ///< when the first click or key happens there, in seconds
+    ScreenPoint centre;                     ///< the middle of `area`
+    ScreenRect area;                        ///< what is visible, in pixels of the recorded display; within the screen
     ZoomReason reason = ZoomReason::Clicks; ///< what happens there
 };
 

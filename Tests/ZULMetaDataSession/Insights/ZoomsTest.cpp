@@ -86,6 +86,7 @@ TEST(Zooms, BeginBeforeAClickAndEndAfterIt) {
     ASSERT_THAT(zooms[0].places, SizeIs(1));
     const ZoomPlace& place = zooms[0].places[0];
     EXPECT_EQ(place.start, zooms[0].start);
+    EXPECT_EQ(place.first, 10);
     EXPECT_EQ(place.reason, ZoomReason::Clicks);
     EXPECT_EQ(place.centre.x, 1400);
     EXPECT_EQ(place.centre.y, 700);
@@ -330,9 +331,11 @@ TEST(Zooms, NeverOverlapNorLeaveTheScreenOrTheRecording) {
             EXPECT_GE(zoom.end - zoom.start, 1);
             EXPECT_EQ(zoom.places.front().start, zoom.start);
             last = zoom.end;
-            for (const auto& [start, centre, area, reason] : zoom.places) {
+            for (const auto& [start, first, centre, area, reason] : zoom.places) {
                 EXPECT_GE(start, zoom.start);
                 EXPECT_LT(start, zoom.end);
+                EXPECT_GE(first, start);
+                EXPECT_LT(first, zoom.end);
                 EXPECT_GE(area.x, session.screen.x);
                 EXPECT_GE(area.y, session.screen.y);
                 EXPECT_LE(area.x + area.width, session.screen.x + session.screen.width + 1e-9);
