@@ -1,12 +1,17 @@
 zulm_add_tests(ZULMetaDataSessionTests
   EditListTest
+  Insights/CameraTest
   Insights/ChaptersTest
   Insights/ClicksTest
+  Insights/CursorPathTest
   Insights/IdleTest
   Insights/KeyCaptionsTest
+  Insights/ZoomsTest
   PictureTest
+  PieceClockTest
   RationalTest
   RecordingTest
+  RetimingTest
   SnapshotTest
   TimeIndexTest
   TimelineTest
