@@ -18,7 +18,7 @@ constexpr std::size_t s_freeBits = 64;                         // so many are st
 }
 
 /// Returns its text for a message.
-std::string shown(const Rational& number) {
+std::string shownNumber(const Rational& number) {
     constexpr std::size_t most = 40;
     std::string text = number.text();
     if (text.size() > most)
@@ -28,7 +28,7 @@ std::string shown(const Rational& number) {
 
 void requireTime(const char* name, const Rational& time) {
     if (time.isNegative())
-        refuse(std::string(name) + " is negative: " + shown(time));
+        refuse(std::string(name) + " is negative: " + shownNumber(time));
     if (time.bits() > s_mostBitsOfNumber)
         refuse(std::string(name) + " has more than 1,000 digits");
 }
@@ -43,7 +43,7 @@ void requireOrder(const EditRange& range) {
     requireTime("start", range.start);
     requireTime("end", range.end);
     if (range.end <= range.start)
-        refuse("end is " + shown(range.end) + ", which is not after start, " + shown(range.start));
+        refuse("end is " + shownNumber(range.end) + ", which is not after start, " + shownNumber(range.start));
 }
 
 /// Returns a part of a time code after a colon: one or two digits, and a fraction if this is the last part.

@@ -1,5 +1,12 @@
 zulm_add_tests(ZULMetaDataSessionTests
   EditListTest
+  EditLists/AutoEditorTest
+  EditLists/CMX3600Test
+  EditLists/ConcatTest
+  EditLists/EditListFilesTest
+  EditLists/LosslessCutTest
+  EditLists/MovieEditListTest
+  EditLists/OpenTimelineTest
   Insights/CameraTest
   Insights/ChaptersTest
   Insights/ClicksTest
