@@ -2,9 +2,12 @@
 
 // Includes everything with which recorders and editors are written.
 
+#include "AbandonedSession.h"
 #include "EditList.h"
 #include "Error.h"
 #include "Rational.h"
 #include "Recording.h"
+#include "RecordingClock.h"
+#include "SessionWriter.h"
 #include "Track.h"
 #include "TrackValues.h"
