@@ -69,13 +69,37 @@ std::optional<StreamExtent> measureStream(const ByteSource& stream) {
     return extent;
 }
 
+bool hasRoomForCursorFields(std::string_view bytes, int version) {
+    const CursorImageSchema schema(version);
+    CursorImage image;
+    double time = 0;
+    Record record{image, time};
+    const auto take = [&bytes](const FieldInfo& field) {
+        if (field.data)
+            bytes.copy(reinterpret_cast<char*>(field.data), field.size);
+        const bool fits = field.size <= bytes.size();
+        bytes.remove_prefix(fits ? field.size : bytes.size());
+        return fits;
+    };
+    bool fits = true;
+    for (const SchemaFieldStep& step : schema.GetBaseInfoSteps())
+        fits = fits && (!step.existsIn(version) || take(step.fieldGetter(record)));
+    for (const SchemaFieldStep& step : schema.GetDataSteps()) {
+        if (!step.existsIn(version) || !step.condition(record))
+            continue;
+        const bool isImage = step.fieldGetter == schema.GetImageFieldInfoFn(); // which would allocate the image
+        fits = fits && take(isImage ? FieldInfo{nullptr, schema.GetImageSize(record)} : step.fieldGetter(record));
+    }
+    return fits;
+}
+
 namespace detail {
 
 bool readEntryBytes(std::string_view bytes, double& time, std::string& text, int) {
     if (!isText(bytes))
         return false;
-    BytesInput input(bytes);
-    readStringEntry(input, time, text);
+    time = detail::numberIn<double>(bytes, sizeof(Size));
+    text = bytes.substr(sizeof(Size) + sizeof(double));
     return true;
 }
 

@@ -5,16 +5,16 @@ zulm_add_tests(ZULMetaDataBridgeTests
   EntryDictionaryTest
   EntryTextsTest
   HumanReadableActionsTest
+  InputVocabularyTest
   Validation/InvalidCorpusTest
-  KeyCaptionsTest
   KeyNamesTest
   KindsTest
   MediaFilesTest
   MetaDataExcerptTest
   ParserFamilyTest
   RecordingCompactionTest
+  RecordingFileTest
   RecordingRedactionTest
-  RecordingTest
   SafeMovieSaveTest
   StreamRedactionTest
   StreamRetimingTest

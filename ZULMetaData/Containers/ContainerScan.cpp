@@ -43,10 +43,11 @@ void walkAtoms(PositionedInput& input, std::uint64_t end, Visit visit) {
     }
 }
 
-bool visitStreamAtom(PositionedInput& input, const ContainerItem& atom, StreamCache& found) {
+bool visitStreamAtom(PositionedInput& input, const ContainerItem& atom, StreamCache& found, ScanMessages messages) {
     if (atom.holdsStream()) // always taken for one with an extended header, the only form that is written
         return storeStream(input, atom.size - s_extendedAtomHeaderSize, found);
-    std::cerr << "Found a non DATA atom mixed in the ZUL meta data\n";
+    if (messages == ScanMessages::Printed)
+        std::cerr << "Found a non DATA atom mixed in the ZUL meta data\n";
     return true;
 }
 
@@ -68,24 +69,25 @@ bool walkChunks(PositionedInput& input, std::uint64_t end, Visit visit) {
 
 } // namespace
 
-void scanAtoms(std::istream& stream, std::uint64_t total, StreamCache& found) {
+void scanAtoms(std::istream& stream, std::uint64_t total, StreamCache& found, ScanMessages messages) {
     PositionedInput input(stream, 0, total);
     walkAtoms(input, total, [&](const ContainerItem& atom) {
         if (atom.holdsMetaData())
             walkAtoms(input, atom.end(),
-                      [&](const ContainerItem& child) { return visitStreamAtom(input, child, found); });
+                      [&](const ContainerItem& child) { return visitStreamAtom(input, child, found, messages); });
         return true;
     });
 }
 
-void scanChunks(std::istream& stream, std::uint64_t total, StreamCache& found, std::uint64_t begin) {
+void scanChunks(std::istream& stream, std::uint64_t total, StreamCache& found, ScanMessages messages,
+                std::uint64_t begin) {
     PositionedInput input(stream, 0, total);
     input.moveTo(begin);
     const auto visitStreamChunk = [&](const ContainerItem& chunk) {
-        if (!chunk.holdsStream())
-            std::cerr << "Found a non DATA chunk mixed in the ZUL meta data\n";
-        else if (!storeStream(input, chunk.sizeField, found))
+        if (chunk.holdsStream() && !storeStream(input, chunk.sizeField, found))
             return false;
+        if (!chunk.holdsStream() && messages == ScanMessages::Printed)
+            std::cerr << "Found a non DATA chunk mixed in the ZUL meta data\n";
         const std::uint32_t padded = chunk.sizeField + (chunk.sizeField & 1); // the largest odd size wraps to 0
         return input.moveTo(chunk.payloadOffset() + padded);
     };
