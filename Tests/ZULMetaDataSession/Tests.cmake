@@ -17,8 +17,10 @@ zulm_add_tests(ZULMetaDataSessionTests
   PictureTest
   PieceClockTest
   RationalTest
+  RecordingClockTest
   RecordingTest
   RetimingTest
+  SessionWriterTest
   SnapshotTest
   TimeIndexTest
   TimelineTest
