@@ -94,7 +94,7 @@ class WrittenCursors {
 public:
     WrittenCursors(EntryIndex& index, StreamOutput& output) : cursors_(index), output_(output) {}
 
-    void write(std::size_t entry, double time) { output_.append(cursors_.written(entry, time)); }
+    void write(std::size_t entry, double time) { output_.append(cursors_.written(entry), time); }
     bool areSame(std::size_t left, std::size_t right) const { return cursors_.areSame(left, right); }
 
 private:

@@ -287,6 +287,18 @@ TEST_F(SafeSave, RefusesDoubtfulSourcesUnlessTheyAreAskedFor) {
     }
 }
 
+TEST_F(SafeSave, AttachesEveryByteOfAStreamAsItIsStored) {
+    const std::string torn = locationStream() + "torn";
+    const std::string odd = streamHeader("2b7b6aff", 1, 0) + "odd";
+    writeFile(movie, media());
+    const AttachResult result = SafeMovieSave(movie).attach(
+        {StreamSource::memory(torn, "torn").asStored(), StreamSource::memory(odd, "odd").asStored()});
+    EXPECT_EQ(contentsOf(movie), media() + zulmAtom({torn, odd}));
+    EXPECT_EQ(result.streams[0].bytes, torn.size());
+    EXPECT_EQ(result.streams[0].bytesCut, 0U);
+    EXPECT_EQ(result.streams[0].entries, 2U);
+}
+
 TEST_F(SafeSave, CutsHostileStreamsDownToWhatIsWhole) {
     const std::map<std::string, std::string> hostile{
         {"an entry of size 0", streamHeader(s_appNames, 1, 0) + textEntry(0.5, "Abc") + le32(0) + "rest"},

@@ -73,6 +73,9 @@ AttachPlan::Stream measured(const StreamSource& source) {
     if (source.isChecked())
         if (const std::string doubt = doubtAbout(*extent, bytes.size()); !doubt.empty())
             throw SaveError(source.name(), doubt, SaveError::Reason::Doubtful);
+    if (source.isAsStored())
+        return {{source.name(), extent->header.uuid, 0, bytes.size(), extent->entries, 0, StreamExtent::AtEntry},
+                bytes};
     return {{source.name(), extent->header.uuid, 0, extent->wholeBytes, extent->entries,
              bytes.size() - extent->wholeBytes, extent->end},
             bytes};

@@ -53,7 +53,7 @@ struct AttachedStream {
     std::string name;                                     ///< of its source
     uuid type{};                                          ///< its kind
     std::uint64_t offset = 0;                             ///< of its header in the movie
-    std::uint64_t bytes = 0;                              ///< header and whole entries
+    std::uint64_t bytes = 0;                              ///< header and whole entries, or all of the source
     std::uint64_t entries = 0;                            ///< all that are whole
     std::uint64_t bytesCut = 0;                           ///< left out, from `bytes` on in the source
     StreamExtent::End cutBecause = StreamExtent::AtEntry; ///< `AtEntry` if nothing was cut
@@ -141,8 +141,8 @@ public:
     /// Returns what was done.
     RepairPlan repair() const;
 
-    /// Appends the streams as one atom, in this order. Bytes after the last whole entry of a stream are left out.
-    /// Throws what `AttachPlan` and its `requireFor` throw.
+    /// Appends the streams as one atom, in this order. Bytes after the last whole entry of a stream are left out,
+    /// unless its source is `asStored`. Throws what `AttachPlan` and its `requireFor` throw.
     ///@{
     AttachResult attach(const AttachPlan& plan, FragmentIndex index = FragmentIndex::Leave) const;
     AttachResult attach(const std::vector<StreamSource>& streams, ExistingStreams existing = ExistingStreams::Refuse,

@@ -26,6 +26,7 @@ bool havePicturesAlike(const CursorImage& left, const CursorImage& right) {
 CursorEntries::CursorEntries(EntryIndex& index) : index_(index) {
     std::unordered_map<std::uint64_t, std::size_t> shown; // pictures by identifier
     std::unordered_map<std::uint64_t, std::size_t> first;
+    const std::size_t bareSize = stored(CursorImage(), 0).size();
     for (std::size_t i = 0; i < index.size(); ++i) {
         const CursorImage cursor = decoded(i);
         const Picture own = ownPictureOf(i, cursor);
@@ -34,18 +35,21 @@ CursorEntries::CursorEntries(EntryIndex& index) : index_(index) {
             first.emplace(cursor.uniqueId, *own);
         }
         const auto found = shown.find(cursor.uniqueId);
-        entries_.push_back({cursor.uniqueId, found == shown.end() ? Picture() : found->second});
+        entries_.push_back({cursor.uniqueId, found == shown.end() ? Picture() : found->second,
+                            !own && index.bytesOf(i).size() == bareSize});
     }
     for (Entry& entry : entries_)
         if (const auto later = first.find(entry.id); !entry.picture && later != first.end())
             entry.picture = later->second;
 }
 
-std::string CursorEntries::written(std::size_t entry, double time) {
-    const auto& [id, picture] = entries_[entry];
-    CursorImage cursor = decoded(entry);
+std::string_view CursorEntries::written(std::size_t entry) {
+    const auto& [id, picture, isBare] = entries_[entry];
     const auto last = lastWritten_.find(id);
     const bool isCarried = picture && (last == lastWritten_.end() || last->second != *picture);
+    if (isBare && !isCarried)
+        return index_.bytesOf(entry);
+    CursorImage cursor = decoded(entry);
     if (isCarried) {
         const auto flags = cursor.flags;
         cursor = decoded(pictures_[*picture]);
@@ -55,6 +59,11 @@ std::string CursorEntries::written(std::size_t entry, double time) {
     } else {
         cursor.freeImageData(true);
     }
+    bytes_ = stored(cursor, index_.times()[entry]);
+    return bytes_;
+}
+
+std::string CursorEntries::stored(const CursorImage& cursor, double time) const {
     std::ostringstream bytes;
     bytes.exceptions(std::ios_base::badbit);
     metaDataWrite(time, cursor, bytes, index_.header().version);

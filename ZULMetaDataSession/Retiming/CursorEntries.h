@@ -9,6 +9,7 @@
 #include <cstdint>
 #include <optional>
 #include <string>
+#include <string_view>
 #include <unordered_map>
 #include <vector>
 
@@ -26,8 +27,9 @@ public:
     }
 
     /// Returns the next entry of another stream, in which these entries stand one after the other as they are asked
-    /// for. It carries its picture if the last one that was written for its identifier is another one.
-    std::string written(std::size_t entry, double time);
+    /// for. It carries its picture if the last one that was written for its identifier is another one. It has its old
+    /// time. The bytes are valid until the next call.
+    std::string_view written(std::size_t entry);
 
 private:
     using Picture = std::optional<std::size_t>; ///< a place in `pictures_`
@@ -35,16 +37,19 @@ private:
     struct Entry {
         std::uint64_t id = 0;
         Picture picture;
+        bool isBare = false; ///< whether it is stored as an entry without a picture is
     };
 
     CursorImage decoded(std::size_t entry);
     Picture ownPictureOf(std::size_t entry, const CursorImage& cursor);
+    std::string stored(const CursorImage& cursor, double time) const;
 
     EntryIndex& index_;
     std::vector<Entry> entries_;
     std::vector<std::size_t> pictures_; ///< pictures that differ, each as an entry that has it
     std::unordered_multimap<std::size_t, std::size_t> picturesByHash_;
     std::unordered_map<std::uint64_t, std::size_t> lastWritten_; ///< pictures by identifier
+    std::string bytes_;
 };
 
 } // namespace ZULMetaData::detail

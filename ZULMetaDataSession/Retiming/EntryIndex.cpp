@@ -2,8 +2,9 @@
 
 #include <algorithm>
 #include <cmath>
-#include <numeric>
 #include <system_error>
+#include <tuple>
+#include <utility>
 
 namespace ZULMetaData::detail {
 
@@ -45,9 +46,9 @@ void EntryIndex::add(double time, const StreamEntry& entry) {
         return;
     }
     if (isDense_ && timeless_ > 0) {
-        isDense_ = false;
         for (std::size_t i = 0; i < times_.size(); ++i)
-            offsets_.push_back(s_metaDataHeaderSize + std::uint64_t{i} * header_.fixedEntrySize);
+            offsets_.push_back(offsetOf(i));
+        isDense_ = false;
     }
     if (!isDense_)
         offsets_.push_back(entry.offset);
@@ -57,22 +58,26 @@ void EntryIndex::add(double time, const StreamEntry& entry) {
 void EntryIndex::putInOrder() {
     if (std::is_sorted(times_.begin(), times_.end()))
         return;
-    std::vector<std::size_t> order(times_.size());
-    std::iota(order.begin(), order.end(), std::size_t{0});
-    std::stable_sort(order.begin(), order.end(),
-                     [this](std::size_t left, std::size_t right) { return times_[left] < times_[right]; });
-    std::vector<double> times;
-    std::vector<std::uint64_t> offsets;
-    times.reserve(order.size());
-    offsets.reserve(order.size());
-    for (const std::size_t entry : order) {
-        times.push_back(times_[entry]);
-        offsets.push_back(isDense_ ? s_metaDataHeaderSize + std::uint64_t{entry} * header_.fixedEntrySize
-                                   : offsets_[entry]);
-    }
-    times_ = std::move(times);
-    offsets_ = std::move(offsets);
+    std::vector<std::pair<double, std::uint64_t>> entries; // times and offsets
+    entries.reserve(times_.size());
+    for (std::size_t i = 0; i < times_.size(); ++i)
+        entries.emplace_back(times_[i], offsetOf(i));
+    std::stable_sort(entries.begin(), entries.end(),
+                     [](const auto& left, const auto& right) { return left.first < right.first; });
     isDense_ = false;
+    offsets_.resize(entries.size());
+    for (std::size_t i = 0; i < entries.size(); ++i)
+        std::tie(times_[i], offsets_[i]) = entries[i];
+    keepInMemory();
+}
+
+/// Entries that are not in order are read from all over the stream.
+void EntryIndex::keepInMemory() {
+    constexpr std::uint64_t most = std::uint64_t{256} << 20;
+    if (reader_.size() > most)
+        return;
+    copy_.resize(static_cast<std::size_t>(reader_.size()));
+    copy_.resize(reader_.source().read(0, copy_));
 }
 
 std::size_t EntryIndex::countBefore(double time) const {
@@ -84,14 +89,27 @@ std::size_t EntryIndex::countUntil(double time) const {
 }
 
 std::string_view EntryIndex::bytesOf(std::size_t entry) {
+    const std::uint64_t offset = offsetOf(entry);
     std::uint64_t size = header_.fixedEntrySize;
-    const std::uint64_t offset = isDense_ ? s_metaDataHeaderSize + std::uint64_t{entry} * size : offsets_[entry];
-    if (size == 0)
-        size = sizeof(std::uint32_t) + std::uint64_t{reader_.numberAt<std::uint32_t>(offset).value_or(0)};
-    const std::string_view bytes = reader_.at(offset, size);
-    if (bytes.size() < std::max<std::uint64_t>(size, timeOffset_ + sizeof(double))) // the file has changed
+    if (size == 0) {
+        const std::string_view stored = at(offset, sizeof(std::uint32_t));
+        size = stored.size() + (stored.empty() ? 0 : numberIn<std::uint32_t>(stored, 0));
+    }
+    const std::string_view bytes = at(offset, size);
+    if (bytes.size() < timeOffset_ + sizeof(double)) // the file has changed
         throw std::system_error(std::make_error_code(std::errc::io_error), "cannot be read");
     return bytes;
+}
+
+/// Returns nothing if fewer bytes can be read.
+std::string_view EntryIndex::at(std::uint64_t offset, std::uint64_t size) {
+    if (copy_.empty()) {
+        const std::string_view bytes = reader_.at(offset, size);
+        return bytes.size() < size ? std::string_view() : bytes;
+    }
+    const bool isThere = offset <= copy_.size() && size <= copy_.size() - offset;
+    return isThere ? std::string_view(copy_).substr(static_cast<std::size_t>(offset), static_cast<std::size_t>(size))
+                   : std::string_view();
 }
 
 } // namespace ZULMetaData::detail

@@ -7,6 +7,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <span>
+#include <string>
 #include <string_view>
 #include <vector>
 
@@ -23,6 +24,8 @@ class EntryIndex {
 public:
     /// Takes a stream that can be decoded. The walk ends at the first entry that does not fit its kind.
     explicit EntryIndex(const ByteSource& stream);
+    EntryIndex(const EntryIndex&) = delete;
+    EntryIndex& operator=(const EntryIndex&) = delete;
 
     const MetaDataHeader& header() const { return header_; }
     std::span<const double> times() const { return times_; }
@@ -44,6 +47,11 @@ public:
 private:
     void add(double time, const StreamEntry& entry);
     void putInOrder();
+    void keepInMemory();
+    std::string_view at(std::uint64_t offset, std::uint64_t size);
+    std::uint64_t offsetOf(std::size_t entry) const {
+        return isDense_ ? s_metaDataHeaderSize + std::uint64_t{entry} * header_.fixedEntrySize : offsets_[entry];
+    }
 
     ByteReader reader_;
     MetaDataHeader header_;
@@ -53,6 +61,7 @@ private:
     bool isDense_;
     std::uint64_t timeless_ = 0;
     std::uint64_t end_ = s_metaDataHeaderSize;
+    std::string copy_; ///< of a stream that is not in order, unless it is large
 };
 
 } // namespace ZULMetaData::detail

@@ -46,7 +46,7 @@ double PieceClock::exactTimeOf(double time) const {
     return std::clamp(nearestExactly(time), first_, last_);
 }
 
-/// The products and sums here must be rounded one by one: this file is compiled without contraction of expressions.
+/// Each product and each sum is rounded by itself: the library is compiled without fused operations.
 double PieceClock::nearestTimeOf(double time) const {
     if (!isInRange_ || !detail::isInRange(time))
         return nearestExactly(time);
