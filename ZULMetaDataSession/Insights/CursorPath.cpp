@@ -25,16 +25,16 @@ struct Corner {
     bool isPinned = false; ///< whether the path passes through it
 };
 
-bool areEqual(const ScreenPoint& left, const ScreenPoint& right) {
+bool areSamePoint(const ScreenPoint& left, const ScreenPoint& right) {
     return left.x == right.x && left.y == right.y;
 }
 
-ScreenPoint between(const ScreenPoint& from, const ScreenPoint& to, double part) {
+ScreenPoint pointBetween(const ScreenPoint& from, const ScreenPoint& to, double part) {
     return {from.x + (to.x - from.x) * part, from.y + (to.y - from.y) * part};
 }
 
 /// Returns the point on the other side of `centre`.
-ScreenPoint mirrored(const ScreenPoint& point, const ScreenPoint& centre) {
+ScreenPoint mirroredPoint(const ScreenPoint& point, const ScreenPoint& centre) {
     return {2 * centre.x - point.x, 2 * centre.y - point.y};
 }
 
@@ -111,12 +111,12 @@ private:
 
     void runForward(std::vector<ScreenPoint>& samples) const {
         for (std::size_t i = 1; i < samples.size(); ++i)
-            samples[i] = between(samples[i - 1], samples[i], weights_[i]);
+            samples[i] = pointBetween(samples[i - 1], samples[i], weights_[i]);
     }
 
     void runBackward(std::vector<ScreenPoint>& samples) const {
         for (std::size_t i = samples.size() - 1; i > 0; --i)
-            samples[i - 1] = between(samples[i], samples[i - 1], weights_[i - 1]);
+            samples[i - 1] = pointBetween(samples[i], samples[i - 1], weights_[i - 1]);
     }
 
     /// Takes the mean of both orders, so that a path and its reverse are smoothed alike.
@@ -164,7 +164,7 @@ public:
         const ScreenPoint atStart = missing(points.front(), samples[margin]);
         const ScreenPoint atEnd = missing(points.back(), samples[margin + steps_]);
         for (std::size_t i = 1; i < steps_; ++i) {
-            const ScreenPoint add = between(atStart, atEnd, static_cast<double>(i) / static_cast<double>(steps_));
+            const ScreenPoint add = pointBetween(atStart, atEnd, static_cast<double>(i) / static_cast<double>(steps_));
             points[i] = {samples[margin + i].x + add.x, samples[margin + i].y + add.y};
         }
         return points;
@@ -188,8 +188,8 @@ private:
                 ++next;
             const Corner& from = corners_[next - 1];
             const Corner& to = corners_[next];
-            points[i] =
-                time < to.time ? between(from.point, to.point, (time - from.time) / (to.time - from.time)) : to.point;
+            points[i] = time < to.time ? pointBetween(from.point, to.point, (time - from.time) / (to.time - from.time))
+                                       : to.point;
         }
         points.front() = corners_.front().point;
         points.back() = corners_.back().point;
@@ -208,8 +208,8 @@ private:
         std::vector<ScreenPoint> samples(points.size() + 2 * margin);
         std::copy(points.begin(), points.end(), samples.begin() + static_cast<std::ptrdiff_t>(margin));
         for (std::size_t i = 1; i <= margin; ++i) {
-            samples[margin - i] = mirrored(points[i], points.front());
-            samples[margin + steps_ + i] = mirrored(points[steps_ - i], points.back());
+            samples[margin - i] = mirroredPoint(points[i], points.front());
+            samples[margin + steps_ + i] = mirroredPoint(points[steps_ - i], points.back());
         }
         return samples;
     }
@@ -226,7 +226,7 @@ public:
         : options_(options), usualDistance_(usualDistance), times_(times), points_(points) {}
 
     void add(const Corner& corner) {
-        if (!stay_.empty() && !areEqual(stay_.back().point, corner.point)) {
+        if (!stay_.empty() && !areSamePoint(stay_.back().point, corner.point)) {
             stayUntilTheMoveTo(corner);
             endStay();
         }
@@ -325,9 +325,9 @@ std::optional<ScreenPoint> CursorPath::at(double time) const {
     if (next == 0 || next == times_.size())
         return next == 0 ? points_.front() : points_.back();
     const ScreenPoint& from = points_[next - 1];
-    if (areEqual(from, points_[next]))
+    if (areSamePoint(from, points_[next]))
         return from;
-    return between(from, points_[next], (time - times_[next - 1]) / (times_[next] - times_[next - 1]));
+    return pointBetween(from, points_[next], (time - times_[next - 1]) / (times_[next] - times_[next - 1]));
 }
 
 std::vector<ScreenPoint> CursorPath::resampled(double start, double rate, std::size_t count) const {
