@@ -1,5 +1,6 @@
 #include "ZULMetaData/StreamEntries.h"
 
+#include <cstring>
 #include <new>
 #include <streambuf>
 #include <utility>
@@ -69,13 +70,37 @@ std::optional<StreamExtent> measureStream(const ByteSource& stream) {
     return extent;
 }
 
+bool hasRoomForCursorFields(std::string_view bytes, int version) {
+    const CursorImageSchema schema(version);
+    CursorImage image;
+    double time = 0;
+    Record record{image, time};
+    const auto take = [&bytes](const FieldInfo& field) {
+        if (field.data)
+            bytes.copy(reinterpret_cast<char*>(field.data), field.size);
+        const bool fits = field.size <= bytes.size();
+        bytes.remove_prefix(fits ? field.size : bytes.size());
+        return fits;
+    };
+    bool fits = true;
+    for (const SchemaFieldStep& step : schema.GetBaseInfoSteps())
+        fits = fits && (!step.existsIn(version) || take(step.fieldGetter(record)));
+    for (const SchemaFieldStep& step : schema.GetDataSteps()) {
+        if (!step.existsIn(version) || !step.condition(record))
+            continue;
+        const bool isImage = step.fieldGetter == schema.GetImageFieldInfoFn(); // which would allocate the image
+        fits = fits && take(isImage ? FieldInfo{nullptr, schema.GetImageSize(record)} : step.fieldGetter(record));
+    }
+    return fits;
+}
+
 namespace detail {
 
 bool readEntryBytes(std::string_view bytes, double& time, std::string& text, int) {
     if (!isText(bytes))
         return false;
-    BytesInput input(bytes);
-    readStringEntry(input, time, text);
+    time = detail::numberIn<double>(bytes, sizeof(Size));
+    text = bytes.substr(sizeof(Size) + sizeof(double));
     return true;
 }
 
@@ -105,15 +130,31 @@ bool readEntryBytes(std::string_view bytes, double& time, CursorImage& image, in
     const std::uint64_t baseSize = schema.GetSizeOfSchemaFieldSteps(schema.GetBaseInfoSteps(), record);
     if (baseSize == 0 || bytes.size() < baseSize)
         return false;
-    BytesInput input(bytes);
-    CursorImageReader reader(version);
-    reader.ReadBaseInfo(input, schema, record);
-    if (record.entrySize != bytes.size() - sizeof record.entrySize ||
-        record.justMetadataSize != bytes.size() - baseSize)
+    const auto take = [&bytes](const FieldInfo& field) {
+        if (!field.data && field.size != 0)
+            throw std::bad_alloc();
+        if (field.size != 0)
+            std::memcpy(field.data, bytes.data(), field.size);
+        bytes.remove_prefix(field.size);
+    };
+    const std::size_t size = bytes.size();
+    for (const SchemaFieldStep& step : schema.GetBaseInfoSteps())
+        if (step.existsIn(version))
+            take(step.fieldGetter(record));
+    if (record.entrySize != size - sizeof record.entrySize || record.justMetadataSize != bytes.size())
         return false;
-    reader.ReadMetaDataFields(input, schema, record);
-    if (reader.hasRunOutOfMemory())
-        throw std::bad_alloc();
+    image.freeImageData(true);
+    for (const SchemaFieldStep& step : schema.GetDataSteps()) {
+        if (bytes.empty() || !step.existsIn(version) || !step.condition(record))
+            continue;
+        const bool isImage = step.fieldGetter == schema.GetImageFieldInfoFn(); // which allocates the image
+        if ((isImage ? schema.GetImageSize(record) : step.fieldGetter(record).size) > bytes.size()) {
+            if (isImage)
+                image.freeImageData(true);
+            break;
+        }
+        take(step.fieldGetter(record));
+    }
     return true;
 }
 

@@ -91,6 +91,9 @@ struct TimedValue {
 template <StreamValue T>
 std::optional<TimedValue<T>> decodeEntry(std::string_view bytes, int version);
 
+/// Returns whether the data part of an entry that holds a cursor image has room for all fields that it should have.
+ZULMETADATA_API bool hasRoomForCursorFields(std::string_view bytes, int version);
+
 // ---------------------------------------------------------------------------------------------------------------
 
 namespace detail {

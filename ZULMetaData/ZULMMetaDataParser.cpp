@@ -1,5 +1,6 @@
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
+#include "ZULMetaData/ByteSourceStream.h"
 #include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/ContainerScan.h"
@@ -7,11 +8,9 @@
 #include "ZULMetaData/PositionedInput.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <fstream>
 #include <iostream>
 #include <stdexcept>
-#include <system_error>
 #include <utility>
 
 namespace ZULMetaData {
@@ -38,19 +37,22 @@ struct InputFile {
     detail::FileInputBuffer buffer;
 };
 
-/// Reads a file of its own or a stream of the caller. Finds nothing before it scans.
+/// Reads a file or a source of its own, or a stream of the caller. Finds nothing before it scans.
 class Parser final : public MetaDataParser {
 public:
     Parser(const std::string& path, StreamType type)
         : file_(std::make_unique<InputFile>(path)), stream_(file_->stream), type_(type) {}
+    Parser(ByteSource source, StreamType type)
+        : source_(std::make_unique<ByteSourceStream>(std::move(source))), stream_(*source_), type_(type) {}
     Parser(std::istream& stream, StreamType type) : stream_(stream), type_(type) {}
 
     bool isOpen() const { return file_->stream.is_open(); }
-    void setStreamType(StreamType type) { type_ = type; }
 
     StreamType getStreamType() const override { return type_; }
     std::istream& getStream() override { return stream_; }
     void close() override {
+        if (source_)
+            source_->close();
         if (!file_)
             return;
         file_->stream.close();
@@ -58,10 +60,10 @@ public:
     }
 
     /// Finds what the plain scan does, and what follows a RIFF chunk whose size is not in its header.
-    void scanThoroughly() {
+    void scanThoroughly(ScanMessages messages) {
         const ByteSource file = ByteSource::stream(stream_);
         rewind();
-        cacheFileStreamInfo();
+        scan(messages);
         requireReadable(stream_);
         if (type_ != Riff)
             return;
@@ -71,7 +73,7 @@ public:
             return;
         rewind();
         detail::StreamCache found;
-        detail::scanChunks(stream_, file.size(), found, chunks.position());
+        detail::scanChunks(stream_, file.size(), found, messages, chunks.position());
         requireReadable(stream_);
         for (const auto& [type, place] : found)
             cacheStream(type, place);
@@ -83,7 +85,8 @@ private:
         stream_.seekg(0);
     }
 
-    std::unique_ptr<InputFile> file_; ///< null if the stream is the caller's
+    std::unique_ptr<InputFile> file_;          ///< is null if something else is read
+    std::unique_ptr<ByteSourceStream> source_; ///< is null if something else is read
     std::istream& stream_;
     StreamType type_;
 };
@@ -118,21 +121,18 @@ std::unique_ptr<MetaDataParser> MetaDataParser::create(std::istream& stream, Str
 }
 
 std::unique_ptr<MetaDataParser> openContainer(const std::string& path) {
-    errno = 0;
-    auto parser = std::make_unique<Parser>(path, Container::Unknown);
-    if (!parser->isOpen())
-        throw std::system_error(errno, std::generic_category(), "cannot be opened");
-    const auto recognized = recognizeContainer(ByteSource::stream(parser->getStream()), path);
+    ByteSource file = ByteSource::file(path);
+    const auto recognized = recognizeContainer(file, path);
     if (recognized.type == Container::Unknown)
         throw std::runtime_error(recognized.refusal());
-    parser->setStreamType(recognized.type);
-    parser->scanThoroughly();
+    auto parser = std::make_unique<Parser>(std::move(file), recognized.type);
+    parser->scanThoroughly(ScanMessages::Printed);
     return parser;
 }
 
-std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, Container::Type type) {
+std::unique_ptr<MetaDataParser> openContainer(std::istream& stream, Container::Type type, ScanMessages messages) {
     auto parser = std::make_unique<Parser>(stream, type);
-    parser->scanThoroughly();
+    parser->scanThoroughly(messages);
     return parser;
 }
 
@@ -150,23 +150,34 @@ MetaDataParser::CachedFileData MetaDataParser::fileDataForUUID(const uuid& type)
 }
 
 void MetaDataParser::loadAllData(std::map<uuid, std::string>& out) {
+    for (const auto& [type, place] : cache_)
+        if (std::string bytes; copyStream(place, bytes))
+            out[type] = std::move(bytes);
+}
+
+std::string MetaDataParser::loadData(const uuid& type) {
+    std::string bytes;
+    if (const auto found = cache_.find(type); found != cache_.end())
+        copyStream(found->second, bytes);
+    return bytes;
+}
+
+/// Returns false if the stream cannot be found in the file.
+bool MetaDataParser::copyStream(const CachedFileData& place, std::string& bytes) {
     std::istream& stream = getStream();
-    for (const auto& [type, range] : cache_) {
-        if (!stream.good())
-            stream.clear();
-        const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
-        stream.seekg(static_cast<std::streamoff>(range.offset));
-        if (!stream.good())
-            continue;
-        std::string& bytes = out[type];
-        bytes.clear();
-        if (stream.peek() == std::istream::traits_type::eof())
-            continue; // nothing there, or a directory, whose size means nothing
-        const std::uint64_t held = std::min(range.length, total - std::min(range.offset, total));
-        bytes.resize(static_cast<std::size_t>(std::min<std::uint64_t>(held, bytes.max_size())));
-        stream.read(bytes.data(), static_cast<std::streamsize>(bytes.size()));
-        bytes.resize(static_cast<std::size_t>(stream.gcount()));
-    }
+    if (!stream.good())
+        stream.clear();
+    const auto total = static_cast<std::uint64_t>(ParserUtil::calcFileSize(stream));
+    stream.seekg(static_cast<std::streamoff>(place.offset));
+    if (!stream.good())
+        return false;
+    if (stream.peek() == std::istream::traits_type::eof())
+        return true; // nothing there, or a directory, whose size means nothing
+    const std::uint64_t held = std::min(place.length, total - std::min(place.offset, total));
+    bytes.resize(static_cast<std::size_t>(std::min<std::uint64_t>(held, bytes.max_size())));
+    stream.read(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+    bytes.resize(static_cast<std::size_t>(stream.gcount()));
+    return true;
 }
 
 void MetaDataParser::cacheStream(const uuid& type, CachedFileData place) {
@@ -174,6 +185,10 @@ void MetaDataParser::cacheStream(const uuid& type, CachedFileData place) {
 }
 
 bool MetaDataParser::cacheFileStreamInfo() {
+    return scan(ScanMessages::Printed);
+}
+
+bool MetaDataParser::scan(ScanMessages messages) {
     const StreamType type = getStreamType();
     if (type == Unknown)
         return false;
@@ -184,9 +199,9 @@ bool MetaDataParser::cacheFileStreamInfo() {
     if (type == RawStream)
         detail::scanRawStream(stream, total, cache_);
     else if (type == QuickTime)
-        detail::scanAtoms(stream, total, cache_);
+        detail::scanAtoms(stream, total, cache_, messages);
     else
-        detail::scanChunks(stream, total, cache_);
+        detail::scanChunks(stream, total, cache_, messages);
     return true;
 }
 

@@ -69,6 +69,10 @@ public:
     /// Copies the bytes of every stream that can be read, up to the end of the file.
     void loadAllData(std::map<uuid, std::string>& out);
 
+    /// Returns the bytes that `loadAllData` copies for one kind, and reads no other stream. Empty if there is no such
+    /// stream or it cannot be read.
+    std::string loadData(const uuid& type);
+
     /// Forgets what was found and searches again. Returns false only for the type `Unknown`. If the stream is in an
     /// error or end-of-file state, clear it first; otherwise nothing is found.
     bool cacheFileStreamInfo();
@@ -76,10 +80,15 @@ public:
 protected:
     MetaDataParser() = default;
 
+    /// Does what `cacheFileStreamInfo` does, and omits its messages if it is told to.
+    bool scan(ScanMessages messages);
+
     /// Makes a stream known that the scan does not find. The next scan forgets it.
     void cacheStream(const uuid& type, CachedFileData place);
 
 private:
+    bool copyStream(const CachedFileData& place, std::string& bytes);
+
     std::map<uuid, CachedFileData> cache_;
 };
 

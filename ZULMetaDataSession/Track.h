@@ -17,6 +17,8 @@
 #include <numeric>
 #include <optional>
 #include <span>
+#include <tuple>
+#include <type_traits>
 #include <utility>
 #include <vector>
 
@@ -47,6 +49,9 @@ public:
     /// others are ordered by time, and equal times keep their order.
     Track(std::vector<double> times, std::vector<Value> values);
 
+    /// The same for times that ascend and are finite already, without a look at them.
+    static Track inOrder(std::vector<double> times, std::vector<Value> values);
+
     std::size_t size() const { return whole().size(); }              ///< returns the number of entries
     bool empty() const { return whole().empty(); }                   ///< returns true if there are none
     std::span<const double> times() const { return whole().times; }  ///< in seconds, ascending and finite
@@ -57,7 +62,9 @@ public:
 
     /// Returns how many entries have a time at or before `time`. The last of them holds then.
     std::size_t countUntil(double time) const {
-        return static_cast<std::size_t>(std::upper_bound(times().begin(), times().end(), time) - times().begin());
+        const auto isUntil = [time](double entry) { return entry <= time; };
+        return static_cast<std::size_t>(std::partition_point(times().begin(), times().end(), isUntil) -
+                                        times().begin());
     }
 
     /// Returns the value of the last entry at or before `time`, or null before the first.
@@ -82,6 +89,8 @@ private:
         std::size_t leftOut = 0;
     };
 
+    explicit Track(Columns columns);
+
     Part whole() const { return columns_ ? Part{columns_->times, columns_->values} : Part(); }
 
     std::shared_ptr<const Columns> columns_;
@@ -91,10 +100,33 @@ private:
 
 namespace detail {
 
+/// The tracks of a list of kinds.
+template <class List>
+struct TracksOf;
+template <class... Kinds>
+struct TracksOf<KindList<Kinds...>> {
+    using Type = std::tuple<Track<Kinds>...>;
+
+    /// Returns the place of a kind in the list.
+    template <class Kind>
+    static constexpr std::size_t placeOf() {
+        std::size_t place = 0;
+        static_cast<void>(((std::is_same_v<Kind, Kinds> ? true : (++place, false)) || ...));
+        return place;
+    }
+};
+
+/// Returns whether the times ascend and none of them is not a number.
+inline bool ascend(std::span<const double> times) {
+    bool isAscending = times.empty() || times.front() <= times.front();
+    for (std::size_t i = 1; i < times.size(); ++i) // to the end, so that several are compared at once
+        isAscending &= times[i - 1] <= times[i];
+    return isAscending;
+}
+
 /// Returns whether the times ascend and are finite.
 inline bool areInOrder(std::span<const double> times) {
-    return std::is_sorted(times.begin(), times.end()) &&
-           std::all_of(times.begin(), times.end(), [](double time) { return std::isfinite(time); });
+    return times.empty() || (ascend(times) && std::isfinite(times.front()) && std::isfinite(times.back()));
 }
 
 /// Returns the numbers of the entries with a finite time, ordered by time.
@@ -110,21 +142,35 @@ inline std::vector<std::size_t> orderOf(std::span<const double> times) {
 } // namespace detail
 
 template <RecordedKind Kind>
+Track<Kind>::Track(Columns columns) {
+    if constexpr (std::is_same_v<Value, CursorAppearance>)
+        detail::sharePictures(columns.values);
+    columns_ = std::make_shared<const Columns>(std::move(columns));
+}
+
+template <RecordedKind Kind>
+Track<Kind> Track<Kind>::inOrder(std::vector<double> times, std::vector<Value> values) {
+    assert(times.size() == values.size() && detail::areInOrder(times));
+    return Track(Columns{std::move(times), std::move(values)});
+}
+
+template <RecordedKind Kind>
 Track<Kind>::Track(std::vector<double> times, std::vector<Value> values) {
     assert(times.size() == values.size());
-    auto columns = std::make_shared<Columns>();
     if (detail::areInOrder(times)) {
-        columns->times = std::move(times);
-        columns->values = std::move(values);
-    } else {
-        const std::vector<std::size_t> order = detail::orderOf(times);
-        columns->leftOut = times.size() - order.size();
-        for (const std::size_t entry : order) {
-            columns->times.push_back(times[entry]);
-            columns->values.push_back(std::move(values[entry]));
-        }
+        *this = inOrder(std::move(times), std::move(values));
+        return;
     }
-    columns_ = std::move(columns);
+    const std::vector<std::size_t> order = detail::orderOf(times);
+    Columns columns;
+    columns.times.reserve(order.size());
+    columns.values.reserve(order.size());
+    columns.leftOut = times.size() - order.size();
+    for (const std::size_t entry : order) {
+        columns.times.push_back(times[entry]);
+        columns.values.push_back(std::move(values[entry]));
+    }
+    *this = Track(std::move(columns));
 }
 
 } // namespace ZULMetaData

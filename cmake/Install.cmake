@@ -1,5 +1,5 @@
-# What `cmake --install` puts in place, in the components Core, Bridge, Tools and Viewer. Of the two libraries, what
-# only a program's build needs is in the components CoreDevelopment and BridgeDevelopment.
+# What `cmake --install` puts in place, in the components Core, Bridge, Session, Tools and Viewer. What only a program's
+# build needs of the libraries is in the components CoreDevelopment, BridgeDevelopment and SessionDevelopment.
 include(CMakePackageConfigHelpers)
 include(GNUInstallDirs)
 
@@ -49,6 +49,8 @@ if(ZULMETADATA_BUILD_BRIDGE)
   endif()
   zulm_install_library(ZULMetaDataBridge Bridge zulmetadata-bridge)
   zulm_find_libraries_from(ZULMetaDataBridge ${CMAKE_INSTALL_FULL_LIBDIR})
+  zulm_install_library(ZULMetaDataSession Session zulmetadata-session)
+  zulm_find_libraries_from(ZULMetaDataSession ${CMAKE_INSTALL_FULL_LIBDIR})
 endif()
 if(ZULMETADATA_BUILD_TOOLS)
   zulm_find_libraries_from(zulm ${CMAKE_INSTALL_FULL_BINDIR})

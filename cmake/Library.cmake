@@ -2,7 +2,7 @@
 # taken away or changes its shape, whatever the release is called; scripts/check-abi.sh tells.
 set(ZULMETADATA_ABI_VERSION 1)
 
-# zulm_library(TARGET NAME): what the two libraries have in common. Programs know TARGET as ZULMetaData::NAME.
+# zulm_library(TARGET NAME): what the libraries have in common. Programs know TARGET as ZULMetaData::NAME.
 function(zulm_library target name)
   add_library(ZULMetaData::${name} ALIAS ${target})
   set_target_properties(${target} PROPERTIES

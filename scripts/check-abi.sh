@@ -14,12 +14,12 @@ rm -rf "$build/installed"
 cmake --install "$build" --prefix "$build/installed" >/dev/null
 
 changed=0
-for library in libZULMetaData libZULMetaDataBridge; do
+for library in libZULMetaData libZULMetaDataBridge libZULMetaDataSession; do
     described=packaging/abi/$library.abi
     now=$build/$library.abi
     abidw --headers-dir "$build/installed/include" --suppressions packaging/abi/inside.ini --exported-interfaces-only \
         --drop-private-types --no-show-locs --no-corpus-path --no-comp-dir-path --out-file "$now" "$build"/installed/lib*/$library.so
-    sed -i -E "s# path='[^']*/((SharedDependencies|ZULMetaData|ZULMetaDataBridge|Platform)/)# path='\\1#" "$now"
+    sed -i -E "s# path='[^']*/((SharedDependencies|ZULMetaData|ZULMetaDataBridge|ZULMetaDataSession|Platform)/)# path='\\1#" "$now"
     if [ "${1:-}" = update ]; then
         cp "$now" "$described"
     else

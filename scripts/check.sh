@@ -38,7 +38,7 @@ check_spelling() {
 check_cppcheck() { # it cannot parse lambdas with template parameters yet
     cppcheck --quiet --enable=warning,performance,portability --std=c++20 --language=c++ --inline-suppr -I . \
         --suppress=missingIncludeSystem --suppress=syntaxError --suppress=internalAstError --error-exitcode=1 \
-        -j "$(nproc)" SharedDependencies ZULMetaData Platform ZULMetaDataBridge Reports Bindings Tools Examples
+        -j "$(nproc)" SharedDependencies ZULMetaData Platform ZULMetaDataBridge ZULMetaDataSession Reports Bindings Tools Examples
 }
 
 run_clang_tidy() { # OPTION...

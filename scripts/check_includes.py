@@ -8,7 +8,7 @@ import pathlib
 import re
 import sys
 
-STANDARD_ONLY = ["SharedDependencies", "ZULMetaData", "ZULMetaDataBridge"]
+STANDARD_ONLY = ["SharedDependencies", "ZULMetaData", "ZULMetaDataBridge", "ZULMetaDataSession"]
 ONE_FOLDER_ONLY = {  # headers of other libraries, and the only folder that may include them
     r"png|tiff": "Platform",
     r"Python\.h|pybind11/|numpy/": "Bindings/Python",
@@ -36,7 +36,7 @@ def layers(root):
 
 def installed_headers(root):
     headers = set()
-    for folder in ("SharedDependencies", "ZULMetaData", "Platform", "ZULMetaDataBridge"):
+    for folder in ("SharedDependencies", "ZULMetaData", "Platform", "ZULMetaDataBridge", "ZULMetaDataSession"):
         text = (root / folder / "CMakeLists.txt").read_text(encoding="utf-8")
         headers.update(f"{folder}/{name}" for name in re.findall(r"^\s+([\w/]+\.h)\b", text, re.MULTILINE))
     return headers

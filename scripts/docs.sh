@@ -20,7 +20,7 @@ echo "== the classes"
 api=$build/html/api
 mkdir -p "$api"
 headers=()
-for folder in SharedDependencies ZULMetaData Platform ZULMetaDataBridge; do # their headers are installed
+for folder in SharedDependencies ZULMetaData Platform ZULMetaDataBridge ZULMetaDataSession; do # their headers are installed
     mapfile -t names < <(sed -nE 's|^ +([A-Za-z0-9_/]+\.h)\)?$|\1|p' "$folder/CMakeLists.txt")
     headers+=("${names[@]/#/$folder/}")
 done

@@ -74,11 +74,15 @@ add_test(NAME Consumers/symbols_of_bridge COMMAND ${CMAKE_COMMAND}
   "-DSHOWN=SafeMovieSave::attach;Image::tiffRepresentation;SaveError"
   "-DHIDDEN=decodePNG;MovieFile" -P ${sources}/CheckSymbols.cmake)
 
+add_test(NAME Consumers/symbols_of_session COMMAND ${CMAKE_COMMAND}
+  -DLIBRARY=${libraries}/libZULMetaDataSession.so -DABI_VERSION=${ZULMETADATA_ABI_VERSION}
+  "-DSHOWN=Recording::streams;Error;Rational::parse" "-DHIDDEN=JsonReader" -P ${sources}/CheckSymbols.cmake)
+
 set_tests_properties(Consumers/find_package Consumers/examples Consumers/pkg_config Consumers/bridge_finds_core
-  Consumers/symbols_of_core Consumers/symbols_of_bridge PROPERTIES FIXTURES_REQUIRED shared_package)
+  Consumers/symbols_of_core Consumers/symbols_of_bridge Consumers/symbols_of_session PROPERTIES FIXTURES_REQUIRED shared_package)
 set_tests_properties(Consumers/find_package_clang_static Consumers/core_without_codecs Consumers/pkg_config_static
   PROPERTIES FIXTURES_REQUIRED static_package)
 set_property(TEST Consumers/install_static Consumers/install_shared Consumers/find_package
   Consumers/find_package_clang_static Consumers/core_without_codecs Consumers/add_subdirectory Consumers/fetch_content
   Consumers/bridge_finds_core Consumers/examples Consumers/pkg_config Consumers/pkg_config_static
-  Consumers/symbols_of_core Consumers/symbols_of_bridge PROPERTY LABELS consumers)
+  Consumers/symbols_of_core Consumers/symbols_of_bridge Consumers/symbols_of_session PROPERTY LABELS consumers)

@@ -27,7 +27,7 @@ foreach(page IN LISTS pages)
     add_custom_command(OUTPUT ${source} COMMAND ${PYTHON3} ${docs_tests}/blocks.py cpp ${page} ${source}
       DEPENDS ${page} ${docs_tests}/blocks.py VERBATIM)
     add_executable(${target} ${source})
-    target_link_libraries(${target} PRIVATE ZULMetaData::Bridge)
+    target_link_libraries(${target} PRIVATE ZULMetaData::Session)
     zulm_project_options(${target})
     set(program $<TARGET_FILE:${target}>)
   endif()

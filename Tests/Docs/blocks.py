@@ -51,7 +51,8 @@ def blocks_of(page):
 
 def cpp_source(page):
     """Turns each block, with or without a `main`, into a function."""
-    includes = ['#include "ZULMetaDataBridge/ZULMetaDataBridge.h"', "#include <filesystem>", "#include <fstream>",
+    includes = ['#include "ZULMetaDataBridge/ZULMetaDataBridge.h"', '#include "ZULMetaDataSession/ZULMetaDataSession.h"',
+                "#include <filesystem>", "#include <fstream>",
                 "#include <iostream>", "#include <memory>", "#include <string>", "#include <vector>"]
     bodies, calls = [], []
     for block in blocks_of(page):

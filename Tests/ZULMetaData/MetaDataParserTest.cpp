@@ -454,6 +454,28 @@ TEST_F(Parser, CopiesTheStreamsOfARiffFileAndABareStream) {
                                      Pair(kind(s_cursorLocations), locationStream())));
 }
 
+TEST_F(Parser, CopiesTheStreamOfOneKind) {
+    const auto parser = createFor("a.mp4", media() + zulmAtom({locationStream(), appNameStream()}));
+    EXPECT_EQ(parser->loadData(kind(s_cursorLocations)), locationStream());
+    EXPECT_EQ(parser->loadData(kind(s_appNames)), appNameStream());
+    EXPECT_EQ(parser->loadData(kind(s_scaleFactors)), "");
+}
+
+TEST_F(Parser, ReadsNoOtherStreamForTheStreamOfOneKind) {
+    WatchedStream movie(zulmAtom({locationStream(), appNameStream(), scaleStream(1.0)}));
+    const auto parser = createFromStream(movie, MetaDataParser::QuickTime);
+    const std::size_t readByScan = movie.buffer().bytesRead();
+    EXPECT_EQ(parser->loadData(kind(s_appNames)), appNameStream());
+    EXPECT_EQ(movie.buffer().bytesRead() - readByScan, appNameStream().size());
+}
+
+TEST_F(Parser, CopiesNothingOfAStreamThatCannotBeReached) {
+    WatchedStream movie(zulmAtom({locationStream()}));
+    const auto parser = createFromStream(movie, MetaDataParser::QuickTime);
+    movie.buffer().refuse(32);
+    EXPECT_EQ(parser->loadData(kind(s_cursorLocations)), "");
+}
+
 TEST_F(Parser, CopiesOverAStreamOfTheSameKindAndKeepsOthers) {
     Streams streams = {{kind(s_cursorLocations), std::string(1000, 'x')}, {kind(s_appNames), "kept"}};
     createFor("a.mp4", zulmAtom({locationStream()}))->loadAllData(streams);

@@ -181,6 +181,23 @@ TEST(DecodeEntry, RefusesACursorImageWhoseSizesDisagree) {
     EXPECT_FALSE(decodeEntry<CursorImage>(cursorEntry(28, 8, data), 100)) << "of a version without fields";
 }
 
+TEST(CursorFields, HaveRoomInAWholeEntry) {
+    const std::string data = le32(3) + raw(4) + raw(5) + "png" + raw(-1) + le32(3);
+    EXPECT_TRUE(hasRoomForCursorFields(cursorEntry(43, 23, data), 2));
+    EXPECT_TRUE(hasRoomForCursorFields(cursorEntry(45, 25, data + "xx"), 2)) << "bytes may be left over";
+    EXPECT_TRUE(hasRoomForCursorFields(cursorEntry(28, 8, le32(0) + le32(3)), 2));
+    EXPECT_TRUE(hasRoomForCursorFields(cursorEntry(20, 0, ""), 1));
+    EXPECT_TRUE(hasRoomForCursorFields(cursorEntry(31, 11, raw(4) + raw(5) + "png"), 1));
+}
+
+TEST(CursorFields, HaveNoRoomInAnEntryThatIsCutShort) {
+    const std::string whole = cursorEntry(43, 23, le32(3) + raw(4) + raw(5) + "png" + raw(-1) + le32(3));
+    for (std::size_t size = 0; size < whole.size(); ++size)
+        EXPECT_FALSE(hasRoomForCursorFields(whole.substr(0, size), 2)) << size;
+    EXPECT_FALSE(hasRoomForCursorFields(cursorEntry(36, 16, le32(0xffffffff) + raw(4) + raw(5) + "pngs"), 2));
+    EXPECT_FALSE(hasRoomForCursorFields(cursorEntry(24, 4, raw(4)), 1)) << "half a hot spot";
+}
+
 TEST(DecodeEntry, ReadsACursorImageOfTheFirstVersionWithoutADataPart) {
     const auto decoded = decodeEntry<CursorImage>(cursorEntry(20, 0, ""), 1);
     ASSERT_TRUE(decoded);

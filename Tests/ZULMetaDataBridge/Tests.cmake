@@ -5,17 +5,18 @@ zulm_add_tests(ZULMetaDataBridgeTests
   EntryDictionaryTest
   EntryTextsTest
   HumanReadableActionsTest
+  InputVocabularyTest
   Validation/InvalidCorpusTest
-  KeyCaptionsTest
   KeyNamesTest
   KindsTest
   MediaFilesTest
   MetaDataExcerptTest
   ParserFamilyTest
   RecordingCompactionTest
+  RecordingFileTest
   RecordingRedactionTest
-  RecordingTest
   SafeMovieSaveTest
+  StoredFieldsTest
   StreamRedactionTest
   StreamRetimingTest
   StreamSalvageTest

@@ -7,6 +7,22 @@ zulm_add_tests(ZULMetaDataSessionTests
   EditLists/LosslessCutTest
   EditLists/MovieEditListTest
   EditLists/OpenTimelineTest
+  Insights/CameraTest
+  Insights/ChaptersTest
+  Insights/ClicksTest
+  Insights/CursorPathTest
+  Insights/IdleTest
+  Insights/KeyCaptionsTest
+  Insights/ZoomsTest
+  PictureTest
+  PieceClockTest
   RationalTest
+  RecordingClockTest
+  RecordingTest
+  RetimingTest
+  SessionWriterTest
+  SnapshotTest
+  TimeIndexTest
+  TimelineTest
   TrackTest)
-target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session)
+target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)

@@ -19,7 +19,7 @@ void store(const HeaderBytes& header, MetaDataParser::CachedFileData range, Stre
     found[type] = range;
 }
 
-/// Stores the stream that begins here. False where not even its header is left.
+/// Stores the stream that begins here. Returns false if fewer bytes than its header are left.
 bool storeStream(PositionedInput& input, std::uint64_t length, StreamCache& found) {
     const std::uint64_t offset = input.position();
     HeaderBytes header;
@@ -29,8 +29,8 @@ bool storeStream(PositionedInput& input, std::uint64_t length, StreamCache& foun
     return true;
 }
 
-/// Calls `visit` with every atom from here to `end`. It may read on, and ends the walk by false. An atom without an end
-/// to go on from ends it too.
+/// Calls `visit` with every atom from here to `end`. It may read on, and ends the walk by returning false. An
+/// atom of no size ends it too.
 template <class Visit>
 void walkAtoms(PositionedInput& input, std::uint64_t end, Visit visit) {
     while (input.position() < end && input.position() < input.total()) {
@@ -43,15 +43,16 @@ void walkAtoms(PositionedInput& input, std::uint64_t end, Visit visit) {
     }
 }
 
-bool visitStreamAtom(PositionedInput& input, const ContainerItem& atom, StreamCache& found) {
+bool visitStreamAtom(PositionedInput& input, const ContainerItem& atom, StreamCache& found, ScanMessages messages) {
     if (atom.holdsStream()) // always taken for one with an extended header, the only form that is written
         return storeStream(input, atom.size - s_extendedAtomHeaderSize, found);
-    std::cerr << "Found a non DATA atom mixed in the ZUL meta data\n";
+    if (messages == ScanMessages::Printed)
+        std::cerr << "Found a non DATA atom mixed in the ZUL meta data\n";
     return true;
 }
 
-/// Calls `visit` with every chunk from here to `end`; it ends the walk by false. Returns false if a chunk of size 0
-/// ended the walk.
+/// Calls `visit` with every chunk from here to `end`; it ends the walk by returning false. Returns false if a chunk of
+/// size 0 ended the walk.
 template <class Visit>
 bool walkChunks(PositionedInput& input, std::uint64_t end, Visit visit) {
     while (input.position() < end && input.position() < input.total()) {
@@ -68,24 +69,25 @@ bool walkChunks(PositionedInput& input, std::uint64_t end, Visit visit) {
 
 } // namespace
 
-void scanAtoms(std::istream& stream, std::uint64_t total, StreamCache& found) {
+void scanAtoms(std::istream& stream, std::uint64_t total, StreamCache& found, ScanMessages messages) {
     PositionedInput input(stream, 0, total);
     walkAtoms(input, total, [&](const ContainerItem& atom) {
         if (atom.holdsMetaData())
             walkAtoms(input, atom.end(),
-                      [&](const ContainerItem& child) { return visitStreamAtom(input, child, found); });
+                      [&](const ContainerItem& child) { return visitStreamAtom(input, child, found, messages); });
         return true;
     });
 }
 
-void scanChunks(std::istream& stream, std::uint64_t total, StreamCache& found, std::uint64_t begin) {
+void scanChunks(std::istream& stream, std::uint64_t total, StreamCache& found, ScanMessages messages,
+                std::uint64_t begin) {
     PositionedInput input(stream, 0, total);
     input.moveTo(begin);
     const auto visitStreamChunk = [&](const ContainerItem& chunk) {
-        if (!chunk.holdsStream())
-            std::cerr << "Found a non DATA chunk mixed in the ZUL meta data\n";
-        else if (!storeStream(input, chunk.sizeField, found))
+        if (chunk.holdsStream() && !storeStream(input, chunk.sizeField, found))
             return false;
+        if (!chunk.holdsStream() && messages == ScanMessages::Printed)
+            std::cerr << "Found a non DATA chunk mixed in the ZUL meta data\n";
         const std::uint32_t padded = chunk.sizeField + (chunk.sizeField & 1); // the largest odd size wraps to 0
         return input.moveTo(chunk.payloadOffset() + padded);
     };

@@ -15,4 +15,10 @@ struct Container {
     };
 };
 
+/// Whether the search for streams prints a line on standard error about each child of metadata that is no stream.
+enum class ScanMessages {
+    Printed, ///< as readers of recordings do
+    Omitted, ///< for programs that must not print
+};
+
 } // namespace ZULMetaData

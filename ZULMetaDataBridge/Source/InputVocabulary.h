@@ -8,6 +8,7 @@
 #include "../../SharedDependencies/Export.h"
 #include "../../ZULMetaData/ZULMMetaDataCommon.h"
 
+#include <array>
 #include <cstdint>
 #include <initializer_list>
 #include <optional>
@@ -52,18 +53,28 @@ enum class Modifier : std::uint8_t {
     Windows,  ///< "win"
 };
 
+/// All buttons, in their order.
+inline constexpr std::array s_mouseButtons{MouseButton::Left, MouseButton::Right, MouseButton::Middle};
+
+/// All modifiers, in their order.
+inline constexpr std::array s_modifiers{Modifier::CapsLock, Modifier::Shift,   Modifier::Control,
+                                        Modifier::Alt,      Modifier::Command, Modifier::Windows};
+
 using MouseButtons = EnumSet<MouseButton>; ///< buttons that are down
 using Modifiers = EnumSet<Modifier>;       ///< modifiers that are down
 
 ZULMETADATA_API std::string_view nameOf(MouseButton button); ///< returns "left", "right" or "middle"
 ZULMETADATA_API std::string_view nameOf(Modifier modifier);  ///< returns the word of the enumerator's comment
 
-/// What a cursor action says. At most one of its button and nothing is told: a number has no room for two buttons.
+/// What a cursor action says. It is about one button at most, because its number has no room for two.
 struct ButtonAction {
     std::optional<MouseButton> button; ///< empty for the first entry of a recording (256) and for numbers without one
     bool isPress = false;              ///< true if the button goes down, false if it comes up
     Modifiers modifiers;               ///< held with a left or right button; those of the middle button are not stored
     std::int32_t stored = 0;           ///< the number in the stream
+
+    /// Returns whether it tells which modifiers are held: only the actions of the left and the right button do.
+    bool tellsModifiers() const { return button && *button != MouseButton::Middle; }
 
     friend bool operator==(const ButtonAction&, const ButtonAction&) = default; ///< compares all fields
 };
@@ -132,6 +143,16 @@ enum class VirtualKey : std::uint32_t {
     Minus = 189,
     Period = 190,
 };
+
+/// Returns the name of a virtual key, such as "returnKey". A digit has the name of its shifted symbol, such as
+/// "exclamation" for 1; but 4 has no name. Empty if the code has no name.
+ZULMETADATA_API std::string_view nameOfVirtualKey(std::uint32_t code);
+
+/// Bits in the flags of a key that are no modifiers.
+///@{
+inline constexpr std::uint32_t s_macFlag = 0x20000000;        ///< shown as "(MAC)"
+inline constexpr std::uint32_t s_virtualKeyFlag = 0x40000000; ///< shown as "(IsVK)": the code is that of a virtual key
+///@}
 
 /// A recorded key: a virtual key, or the character that it typed.
 struct KeyInput {

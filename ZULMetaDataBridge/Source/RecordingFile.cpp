@@ -35,20 +35,20 @@ Container::Type recognizedType(const ByteSource& bytes, const std::string& name)
 } // namespace
 
 RecordingFile::RecordingFile(const FileLocation& file, std::string name)
-    : RecordingFile(utf8Path(file), std::move(name), {}) {}
+    : RecordingFile(utf8Path(file), std::move(name), {}, ScanMessages::Printed) {}
 
-RecordingFile::RecordingFile(ByteSource bytes, std::string name)
-    : RecordingFile({}, std::move(name), std::move(bytes)) {}
+RecordingFile::RecordingFile(ByteSource bytes, std::string name, ScanMessages messages)
+    : RecordingFile({}, std::move(name), std::move(bytes), messages) {}
 
-RecordingFile::RecordingFile(std::string path, std::string name, std::optional<ByteSource> bytes)
+RecordingFile::RecordingFile(std::string path, std::string name, std::optional<ByteSource> bytes, ScanMessages messages)
     : path_(std::move(path)), name_(name.empty() ? path_ : std::move(name)),
       bytes_(bytes ? namedSource(*bytes, name_) : openSource(path_, name_)),
-      input_(std::make_unique<ByteSourceStream>(bytes_)), parser_(opened(name_, [this] {
-          return openContainer(*input_, recognizedType(bytes_, path_.empty() ? name_ : path_));
+      input_(std::make_unique<ByteSourceStream>(bytes_)), parser_(opened(name_, [this, messages] {
+          return openContainer(*input_, recognizedType(bytes_, path_.empty() ? name_ : path_), messages);
       })) {}
 
 std::optional<double> RecordingFile::duration() const {
-    return movieDuration(bytes_, container());
+    return validation_ ? validation_->duration : movieDuration(bytes_, container());
 }
 
 std::vector<ZCAPHeader> RecordingFile::creators() const {

@@ -52,7 +52,7 @@ public:
     explicit RecordingFile(const FileLocation& file, std::string name = {});
 
     /// The same for bytes of the caller.
-    RecordingFile(ByteSource bytes, std::string name);
+    RecordingFile(ByteSource bytes, std::string name, ScanMessages messages = ScanMessages::Printed);
 
     const std::string& path() const { return path_; } ///< the file's path; empty for bytes of the caller
     const std::string& name() const { return name_; } ///< what errors call it
@@ -97,7 +97,7 @@ public:
     }
 
 private:
-    RecordingFile(std::string path, std::string name, std::optional<ByteSource> bytes);
+    RecordingFile(std::string path, std::string name, std::optional<ByteSource> bytes, ScanMessages messages);
 
     std::string path_;
     std::string name_;

@@ -11,7 +11,7 @@ from conan.tools.files import copy, load, rmdir
 
 required_conan_version = ">=2.0"
 
-FOLDERS = ("cmake", "SharedDependencies", "ZULMetaData", "Platform", "ZULMetaDataBridge")
+FOLDERS = ("cmake", "SharedDependencies", "ZULMetaData", "Platform", "ZULMetaDataBridge", "ZULMetaDataSession")
 
 
 class ZULMetaDataConan(ConanFile):
@@ -94,3 +94,8 @@ class ZULMetaDataConan(ConanFile):
         bridge.set_property("pkg_config_name", "zulmetadata-bridge")
         if self._needs_codecs:
             bridge.requires += ["libpng::libpng", "libtiff::libtiff"]
+        session = self.cpp_info.components["session"]
+        session.libs = ["ZULMetaDataSession"]
+        session.requires = ["bridge"]
+        session.set_property("cmake_target_name", "ZULMetaData::Session")
+        session.set_property("pkg_config_name", "zulmetadata-session")

@@ -131,11 +131,43 @@ TEST(ContainerRecognition, OpensAFileByItsContents) {
     EXPECT_EQ(streamsOf(*parser), (std::vector<FoundStream>{{kind(s_cursorLocations), 62, 56}}));
 }
 
+TEST(ContainerRecognition, ClosesTheFileThatItOpened) {
+    const TemporaryFolder folder;
+    writeFile(folder / "Recording.mp4", media() + zulmAtom({locationStream()}));
+    const auto parser = openContainer(folder / "Recording.mp4");
+    std::map<uuid, std::string> streams;
+    parser->loadAllData(streams);
+    EXPECT_EQ(streams.at(kind(s_cursorLocations)), locationStream());
+    parser->close();
+    EXPECT_EQ(parser->fileDataForUUID(kind(s_cursorLocations)).length, 56U);
+    streams.clear();
+    parser->loadAllData(streams);
+    EXPECT_TRUE(streams.empty() || streams.at(kind(s_cursorLocations)).empty());
+}
+
 TEST(ContainerRecognition, ThrowsForWhatItCannotOpen) {
     const TemporaryFolder folder;
     writeFile(folder / "Zeros.mp4", std::string(5000, '\0'));
     EXPECT_THROW(openContainer(folder / "missing.mp4"), std::system_error);
+    EXPECT_THROW(openContainer(folder / "."), std::system_error);
     EXPECT_THROW(openContainer(folder / "Zeros.mp4"), std::runtime_error);
+}
+
+TEST(ContainerRecognition, OmitsTheMessagesOfTheSearchIfItIsToldTo) {
+    const std::string child = chunk("JUNK", "junk") + chunk("DATA", locationStream());
+    for (const auto& [type, bytes] :
+         {std::pair(QuickTime,
+                    extendedAtom("ZULM", extendedAtom("free", "junk") + extendedAtom("DATA", locationStream()))),
+          std::pair(Riff, riffMedia() + chunk("ZULM", child))}) {
+        std::istringstream stream(bytes);
+        testing::internal::CaptureStderr();
+        const auto silent = streamsOf(*openContainer(stream, type, ScanMessages::Omitted));
+        EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+        testing::internal::CaptureStderr();
+        EXPECT_EQ(streamsOf(*openContainer(stream, type)), silent);
+        EXPECT_EQ(testing::internal::GetCapturedStderr().find("Found a non DATA "), 0U);
+        EXPECT_EQ(silent.size(), 1U);
+    }
 }
 
 TEST(ContainerRecognition, NamesTheExtensionThatTellsTheSame) {

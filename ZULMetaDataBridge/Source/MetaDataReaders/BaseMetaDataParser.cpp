@@ -2,10 +2,7 @@
 
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
-#include <ios>
-#include <map>
 #include <string>
-#include <utility>
 
 namespace ZULMetaData {
 
@@ -16,10 +13,8 @@ BaseMetaDataParser* BaseMetaDataParser::initWithMetaDataFile(const FileLocation&
 }
 
 std::unique_ptr<std::stringstream> BaseMetaDataParser::getMetaDataStream(uuid type) const {
-    std::map<uuid, std::string> streams;
-    if (const auto container = MetaDataParser::create(utf8Path(metaDataFile())))
-        container->loadAllData(streams);
-    return std::make_unique<std::stringstream>(std::move(streams[type]));
+    const auto container = MetaDataParser::create(utf8Path(metaDataFile()));
+    return std::make_unique<std::stringstream>(container ? container->loadData(type) : std::string());
 }
 
 } // namespace ZULMetaData
