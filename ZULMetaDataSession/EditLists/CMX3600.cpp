@@ -104,7 +104,7 @@ public:
             list_.moveTo("line", line_);
             readLine(takeLine(text));
         }
-        list_.moveTo("");
+        list_.moveToFile();
         if (events_.empty())
             list_.fail("the list has no events of pictures");
         addEvents();

@@ -27,7 +27,7 @@ void orFail(const ListBuilder& list, Add add) {
 } // namespace
 
 void ListBuilder::fail(const std::string& sentence) const {
-    throw Error(file_, place_.empty() ? sentence : place_ + ": " + sentence);
+    throw Error(file_, kind_ ? kind_ + (' ' + std::to_string(number_)) + ": " + sentence : sentence);
 }
 
 void ListBuilder::requireSource(const std::string& source) {
