@@ -44,8 +44,8 @@ struct ZulmRecording {
         ZulmStream summary; // points into these texts
     };
 
-    ZulmRecording(const ByteSource& bytes, const std::string& name)
-        : bytes(bytes), recording(bytes, name), duration(recording.duration()),
+    ZulmRecording(const ByteSource& source, const std::string& name)
+        : bytes(source), recording(source, name), duration(recording.duration()),
           found(summarized(recording.examinedStreams())), hidden(summarized(recording.hiddenStreams())) {}
 
     /// Returns what tables are made from. It is opened at the first call.
