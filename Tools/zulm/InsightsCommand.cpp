@@ -234,6 +234,9 @@ ExitCode showInsights(const std::string& path, const InsightOptions& options, Ru
         return complainAboutNothing(file, insightKinds());
     SourceReader reader(file);
     const Insights insights = insightsOf(reader.read(), options);
+    if (!insights.clicks.empty() && insights.screen.width <= 0)
+        warn(fmt::format("{}: has no stream {}, so it is not known where to zoom in", file.name(),
+                         metaDataKindName(RecordingRegionKind::type)));
     if (report.isWanted())
         write(report.beginFile(file.name()), insights);
     else
