@@ -56,9 +56,15 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         EXPECT_EQ(file.path().filename(), name + ".schema.json");
         commands.push_back(name.substr(5));
     }
+<<<<<<< HEAD
     EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "edits",
                                                         "extract", "grep", "info", "redact", "repair", "salvage",
                                                         "stamp", "verify", "view"));
+=======
+    EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump",
+                                                        "extract", "grep", "info", "insights", "redact", "repair",
+                                                        "salvage", "stamp", "verify", "view"));
+>>>>>>> w5-s24
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
@@ -125,6 +131,13 @@ TEST_F(Schema, HoldsForGrep) {
         {outputOf({"grep", "e", movie(), streamFile("slideText")}), outputOf({"grep", "nowhere at all", movie()})});
 }
 
+TEST_F(Schema, HoldsForInsights) {
+    const std::string strange = written("strange.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1e300, "\xff"));
+    const std::string press = written("press.dat", streamHeader("2b7b6af0", 1, 12) + f64(1e300) + le32(1));
+    expectValid({outputOf({"insights", movie(), odd(), torn()}), outputOf({"insights", "--show-keys", movie()}),
+                 outputOf({"insights", strange, press, written("na\xff.dat", locations())})});
+}
+
 TEST_F(Schema, HoldsForAttachAndStamp) {
     const std::string tornNames = written("names.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "whole") +
                                                            textEntry(2, "torn").substr(0, 9));
@@ -175,6 +188,7 @@ TEST_F(Schema, HoldsIfNothingCanBeReadOrFound) {
                                                {"atoms"},
                                                {"verify"},
                                                {"grep", "a"},
+                                               {"insights"},
                                                {"diff", movie()},
                                                {"extract", "-o", folder / "streams"},
                                                {"salvage", "-o", folder / "streams"},

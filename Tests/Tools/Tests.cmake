@@ -28,6 +28,7 @@ zulm_add_tests(ToolsTests
   ExtractCommandTest
   GrepCommandTest
   InfoCommandTest
+  InsightsCommandTest
   JsonReportTest
   ManualTest
   OutOfMemoryTest

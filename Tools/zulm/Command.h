@@ -26,6 +26,7 @@ using Action = std::function<ExitCode()>;
 void addInfoCommand(CLI::App& app, Action& chosen);
 void addAtomsCommand(CLI::App& app, Action& chosen);
 void addDumpCommand(CLI::App& app, Action& chosen);
+void addInsightsCommand(CLI::App& app, Action& chosen);
 void addDiffCommand(CLI::App& app, Action& chosen);
 void addGrepCommand(CLI::App& app, Action& chosen);
 void addViewCommand(CLI::App& app, Action& chosen);
