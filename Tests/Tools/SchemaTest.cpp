@@ -56,15 +56,9 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         EXPECT_EQ(file.path().filename(), name + ".schema.json");
         commands.push_back(name.substr(5));
     }
-<<<<<<< HEAD
     EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "edits",
-                                                        "extract", "grep", "info", "redact", "repair", "salvage",
-                                                        "stamp", "verify", "view"));
-=======
-    EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump",
                                                         "extract", "grep", "info", "insights", "redact", "repair",
                                                         "salvage", "stamp", "verify", "view"));
->>>>>>> w5-s24
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
