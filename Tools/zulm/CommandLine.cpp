@@ -27,7 +27,9 @@ struct CommandGroup {
 
 /// All commands, in the order of the help.
 const std::vector<CommandGroup> s_commandGroups{
-    {"Look", {addInfoCommand, addAtomsCommand, addDumpCommand, addDiffCommand, addGrepCommand, addViewCommand}},
+    {"Look",
+     {addInfoCommand, addAtomsCommand, addDumpCommand, addDiffCommand, addGrepCommand, addStateCommand,
+      addViewCommand}},
     {"Check and rescue", {addVerifyCommand, addRepairCommand, addSalvageCommand}},
     {"Change", {addAttachCommand, addStampCommand, addRedactCommand, addCompactCommand, addDetachCommand}},
     {"Convert", {addExtractCommand, addConvertCommand}},
