@@ -8,7 +8,7 @@ namespace ZULMetaData {
 namespace {
 
 constexpr std::size_t s_mostPieces = 1'000'000;
-constexpr std::size_t s_mostBits = 16'384;
+constexpr std::size_t s_mostBits = 65'536;
 constexpr std::size_t s_mostBitsOfNumber = 3'321;              // a thousand decimal digits
 constexpr std::size_t s_mostStoredBits = std::size_t{1} << 31; // 256 MiB
 constexpr std::size_t s_freeBits = 64;                         // so many are stored without further memory
@@ -18,7 +18,7 @@ constexpr std::size_t s_freeBits = 64;                         // so many are st
 }
 
 /// Returns its text for a message.
-std::string shown(const Rational& number) {
+std::string shownNumber(const Rational& number) {
     constexpr std::size_t most = 40;
     std::string text = number.text();
     if (text.size() > most)
@@ -28,7 +28,7 @@ std::string shown(const Rational& number) {
 
 void requireTime(const char* name, const Rational& time) {
     if (time.isNegative())
-        refuse(std::string(name) + " is negative: " + shown(time));
+        refuse(std::string(name) + " is negative: " + shownNumber(time));
     if (time.bits() > s_mostBitsOfNumber)
         refuse(std::string(name) + " has more than 1,000 digits");
 }
@@ -43,7 +43,7 @@ void requireOrder(const EditRange& range) {
     requireTime("start", range.start);
     requireTime("end", range.end);
     if (range.end <= range.start)
-        refuse("end is " + shown(range.end) + ", which is not after start, " + shown(range.start));
+        refuse("end is " + shownNumber(range.end) + ", which is not after start, " + shownNumber(range.start));
 }
 
 /// Returns a part of a time code after a colon: one or two digits, and a fraction if this is the last part.
@@ -118,19 +118,8 @@ void EditList::add(EditPiece piece) {
     if (pieces_.size() >= s_mostPieces)
         refuse("the list has more than " + std::to_string(s_mostPieces) + " pieces");
     pieces_.push_back(std::move(piece));
-    duration_ = duration;
+    bases_.push_back(std::exchange(duration_, duration));
     storedBits_ = bits;
-}
-
-std::vector<Rational> EditList::bases() const {
-    std::vector<Rational> bases;
-    bases.reserve(pieces_.size());
-    Rational base;
-    for (const EditPiece& piece : pieces_) {
-        bases.push_back(base);
-        base = base + piece.duration;
-    }
-    return bases;
 }
 
 EditList EditList::without(std::vector<EditRange> removed, const Rational& duration) {

@@ -235,6 +235,8 @@ Natural Natural::difference(std::int64_t leftFactor, const Natural& left, std::i
 }
 
 Natural operator*(const Natural& left, const Natural& right) {
+    if (left.isOne() || right.isOne())
+        return left.isOne() ? right : left;
     Natural product;
     product.digits_.assign(left.digits_.size() + right.digits_.size(), 0);
     for (std::size_t i = 0; i < left.digits_.size(); ++i) {
@@ -262,6 +264,8 @@ std::strong_ordering operator<=>(const Natural& left, const Natural& right) {
 Natural::Division Natural::dividedBy(const Natural& divisor) const {
     if (*this < divisor)
         return {{}, *this};
+    if (divisor.isOne())
+        return {*this, {}};
     if (divisor.digits_.size() == 1) {
         Natural quotient = *this;
         const std::uint32_t remainder = quotient.divideBy(divisor.digits_[0]);
@@ -304,8 +308,8 @@ Natural greatestCommonDivisor(Natural left, Natural right) {
         std::swap(left, right);
     while (right.digits_.size() > 2)
         Natural::reduceTogether(left, right);
-    if (right.isZero())
-        return left;
+    if (right.isZero() || right.isOne())
+        return right.isZero() ? left : right;
     const std::uint64_t remainder = left.dividedBy(right).remainder.in64Bits().value_or(0);
     return Natural(std::gcd(remainder, right.in64Bits().value_or(0)));
 }

@@ -68,6 +68,21 @@ struct Rational::Large {
 };
 
 struct Rational::Arithmetic {
+    /// The magnitudes of a number, which outlives them. Those of a large number are not copied.
+    class Magnitudes {
+    public:
+        explicit Magnitudes(const Rational& number) : large_(number.large_.get()) {
+            if (!large_)
+                small_ = {Natural(magnitudeOf(number.numerator_)), Natural(magnitudeOf(number.denominator_))};
+        }
+
+        const Large* operator->() const { return large_ ? large_ : &small_; }
+
+    private:
+        const Large* large_;
+        Large small_;
+    };
+
     static Rational made(bool isNegative, std::uint64_t numerator, std::uint64_t denominator) {
         Rational result;
         result.numerator_ = static_cast<std::int64_t>(numerator);
@@ -103,12 +118,6 @@ struct Rational::Arithmetic {
         return made(isNegative, numerator.dividedBy(common).quotient, denominator.dividedBy(common).quotient);
     }
 
-    static Large magnitudes(const Rational& number) {
-        if (number.large_)
-            return *number.large_;
-        return {Natural(magnitudeOf(number.numerator_)), Natural(magnitudeOf(number.denominator_))};
-    }
-
     static Rational negated(Rational number) {
         number.numerator_ = -number.numerator_;
         return number;
@@ -135,20 +144,20 @@ struct Rational::Arithmetic {
     }
 
     static Rational largeSum(const Rational& left, const Rational& right) {
-        const Large first = magnitudes(left);
-        const Large second = magnitudes(right);
-        const Natural common = greatestCommonDivisor(first.denominator, second.denominator);
-        const Natural firstRest = first.denominator.dividedBy(common).quotient;
-        const Natural secondRest = second.denominator.dividedBy(common).quotient;
-        const Natural firstPart = first.numerator * secondRest;
-        const Natural secondPart = second.numerator * firstRest;
+        const Magnitudes first(left);
+        const Magnitudes second(right);
+        const Natural common = greatestCommonDivisor(first->denominator, second->denominator);
+        const Natural firstRest = first->denominator.dividedBy(common).quotient;
+        const Natural secondRest = second->denominator.dividedBy(common).quotient;
+        const Natural firstPart = first->numerator * secondRest;
+        const Natural secondPart = second->numerator * firstRest;
         const bool isNegative = firstPart < secondPart ? right.isNegative() : left.isNegative();
         const Natural numerator = left.isNegative() == right.isNegative() ? firstPart + secondPart
                                   : firstPart < secondPart                ? secondPart - firstPart
                                                                           : firstPart - secondPart;
         const Natural cancelled = greatestCommonDivisor(numerator.dividedBy(common).remainder, common);
         return made(isNegative, numerator.dividedBy(cancelled).quotient,
-                    firstRest * second.denominator.dividedBy(cancelled).quotient);
+                    firstRest * second->denominator.dividedBy(cancelled).quotient);
     }
 
     static Rational product(const Rational& left, const Rational& right) {
@@ -163,13 +172,13 @@ struct Rational::Arithmetic {
     }
 
     static Rational largeProduct(const Rational& left, const Rational& right) {
-        const Large a = magnitudes(left);
-        const Large b = magnitudes(right);
-        const Natural first = greatestCommonDivisor(a.numerator, b.denominator);
-        const Natural second = greatestCommonDivisor(b.numerator, a.denominator);
+        const Magnitudes a(left);
+        const Magnitudes b(right);
+        const Natural first = greatestCommonDivisor(a->numerator, b->denominator);
+        const Natural second = greatestCommonDivisor(b->numerator, a->denominator);
         return made(left.isNegative() != right.isNegative(),
-                    a.numerator.dividedBy(first).quotient * b.numerator.dividedBy(second).quotient,
-                    a.denominator.dividedBy(second).quotient * b.denominator.dividedBy(first).quotient);
+                    a->numerator.dividedBy(first).quotient * b->numerator.dividedBy(second).quotient,
+                    a->denominator.dividedBy(second).quotient * b->denominator.dividedBy(first).quotient);
     }
 
     static std::strong_ordering compare(const Rational& left, const Rational& right) {
@@ -182,9 +191,9 @@ struct Rational::Arithmetic {
         }
         if (left.isNegative() != right.isNegative())
             return right.isNegative() <=> left.isNegative();
-        const Large a = magnitudes(left);
-        const Large b = magnitudes(right);
-        const auto order = a.numerator * b.denominator <=> b.numerator * a.denominator;
+        const Magnitudes a(left);
+        const Magnitudes b(right);
+        const auto order = a->numerator * b->denominator <=> b->numerator * a->denominator;
         return left.isNegative() ? 0 <=> order : order;
     }
 
@@ -260,9 +269,9 @@ double Rational::nearest() const {
 }
 
 std::string Rational::text() const {
-    const Large magnitudes = Arithmetic::magnitudes(*this);
-    const std::string integer = (isNegative() ? "-" : "") + magnitudes.numerator.text();
-    return magnitudes.denominator == Natural(1) ? integer : integer + '/' + magnitudes.denominator.text();
+    const Arithmetic::Magnitudes magnitudes(*this);
+    const std::string integer = (isNegative() ? "-" : "") + magnitudes->numerator.text();
+    return magnitudes->denominator.isOne() ? integer : integer + '/' + magnitudes->denominator.text();
 }
 
 std::size_t Rational::bits() const {

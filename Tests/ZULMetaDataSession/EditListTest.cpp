@@ -1,30 +1,20 @@
 #include "ZULMetaDataSession/EditList.h"
+#include "Tests/ZULMetaDataSession/EditListTexts.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include <functional>
 #include <string>
 #include <utility>
 #include <vector>
 
-namespace ZULMetaData {
+namespace ZULMetaData::Test {
 namespace {
 
 using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::IsEmpty;
 using testing::StartsWith;
-
-/// Returns what the error says that `act` throws.
-std::string errorOf(const std::function<void()>& act) {
-    try {
-        act();
-    } catch (const Error& error) {
-        return error.what();
-    }
-    return "no error";
-}
 
 std::string errorOfReading(const std::string& json) {
     return errorOf([&json] { EditList::read(json, "a.json"); });
@@ -39,17 +29,7 @@ EditList listOf(const std::string& pieces) {
     return EditList::read(documentOf(pieces), "a.json");
 }
 
-/// Returns each piece as "start-end@speed=duration" or "at+duration".
-std::vector<std::string> textsOf(const EditList& edits) {
-    std::vector<std::string> texts;
-    for (const EditPiece& piece : edits.pieces())
-        texts.push_back(piece.isHeld() ? piece.start.text() + '+' + piece.duration.text()
-                                       : piece.start.text() + '-' + piece.end.text() + '@' + piece.speed.text() + '=' +
-                                             piece.duration.text());
-    return texts;
-}
-
-std::vector<std::string> textsOf(const std::vector<Rational>& numbers) {
+std::vector<std::string> numberTexts(const std::vector<Rational>& numbers) {
     std::vector<std::string> texts;
     for (const Rational& number : numbers)
         texts.push_back(number.text());
@@ -78,7 +58,7 @@ TEST(EditList, KnowsWhereItsPiecesBegin) {
     edits.keep(0, 1, 3);
     edits.hold(9, {1, 3});
     edits.keep(5, 6);
-    EXPECT_THAT(textsOf(edits.bases()), ElementsAre("0", "1/3", "2/3", "1"));
+    EXPECT_THAT(numberTexts(edits.bases()), ElementsAre("0", "1/3", "2/3", "1"));
     EXPECT_EQ(edits.duration(), 2);
 }
 
@@ -338,4 +318,4 @@ TEST(EditList, LeavesOutTheUnionOfRanges) {
 }
 
 } // namespace
-} // namespace ZULMetaData
+} // namespace ZULMetaData::Test

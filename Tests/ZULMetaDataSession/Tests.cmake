@@ -1,12 +1,27 @@
 zulm_add_tests(ZULMetaDataSessionTests
   EditListTest
+  EditLists/AutoEditorTest
+  EditLists/CMX3600Test
+  EditLists/ConcatTest
+  EditLists/EditListFilesTest
+  EditLists/LosslessCutTest
+  EditLists/MovieEditListTest
+  EditLists/OpenTimelineTest
+  Insights/CameraTest
   Insights/ChaptersTest
   Insights/ClicksTest
+  Insights/CursorPathTest
   Insights/IdleTest
+  Insights/InsightsTest
   Insights/KeyCaptionsTest
+  Insights/ZoomsTest
   PictureTest
+  PieceClockTest
   RationalTest
+  RecordingClockTest
   RecordingTest
+  RetimingTest
+  SessionWriterTest
   SnapshotTest
   TimeIndexTest
   TimelineTest

@@ -1,5 +1,6 @@
 #include "ZULMetaDataSession/EditLists/Json.h"
 
+#include "SharedDependencies/UTF8.h"
 #include "ZULMetaDataBridge/Source/EntryTexts.h"
 #include "ZULMetaDataSession/Error.h"
 
@@ -68,7 +69,7 @@ private:
 
     void require(std::string_view characters) {
         if (!take(characters))
-            fail(isAtEnd() ? "the document is cut short" : "\"" + std::string(characters) + "\" is missing");
+            fail(isAtEnd() ? "the document is cut short" : inQuotes(characters) + " is missing");
     }
 
     bool takeBlank() {
@@ -178,7 +179,7 @@ private:
         if (first == members.end())
             return;
         position_ = static_cast<std::size_t>((*std::next(first))->offset);
-        fail("an object has two members \"" + (*first)->name + '"');
+        fail("an object has two members " + inQuotes((*first)->name));
     }
 
     std::string readDigits() {
@@ -311,6 +312,16 @@ const JsonValue* JsonValue::find(std::string_view member) const {
         return isObject() && item.name == member;
     });
     return found == items.end() ? nullptr : &*found;
+}
+
+std::string inQuotes(std::string_view text) {
+    constexpr std::size_t most = 80;
+    if (text.size() <= most)
+        return '"' + std::string(text) + '"';
+    std::size_t length = most;
+    while (length > 0 && continuesCharacter(text[length]))
+        --length;
+    return '"' + std::string(text.substr(0, length)) + "...\"";
 }
 
 JsonValue readJson(std::string_view document, const std::string& file, JsonDialect dialect) {

@@ -39,6 +39,9 @@ enum class JsonDialect {
     JSON5, ///< also comments, trailing commas, names without quotes, single quotes, and more forms of decimal numbers
 };
 
+/// Returns a text in quotation marks for a message. A long one is cut short.
+std::string inQuotes(std::string_view text);
+
 /// Reads a document. Throws `Error` that names `file` and the position for what is no such document, for bytes that are
 /// not UTF-8, two members of one name, more than 64 levels, more than a million values, and anything after the
 /// document.

@@ -55,7 +55,7 @@ private:
     void requireMembers(const JsonValue& object, const std::string_view (&known)[Count]) const {
         for (const JsonValue& member : object.items)
             if (std::find(std::begin(known), std::end(known), member.name) == std::end(known))
-                fail('"' + member.name + "\" is no member that can stand here");
+                fail(detail::inQuotes(member.name) + " is no member that can stand here");
     }
 
     void readPiece(const JsonValue& piece) {

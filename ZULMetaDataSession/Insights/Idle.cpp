@@ -10,7 +10,7 @@ namespace ZULMetaData {
 namespace {
 
 /// Returns the times at which the cursor was somewhere else than before.
-std::vector<double> movesOf(const Track<CursorLocationKind>& positions) {
+std::vector<double> timesOfMoves(const Track<CursorLocationKind>& positions) {
     std::vector<double> times;
     for (std::size_t i = 0; i < positions.size(); ++i)
         if (i == 0 || positions.values()[i] != positions.values()[i - 1])
@@ -27,7 +27,7 @@ std::vector<double> pressesAndReleasesOf(const Track<CursorActionKind>& actions)
     return times;
 }
 
-std::vector<double> merged(std::span<const double> left, std::span<const double> right) {
+std::vector<double> mergedTimes(std::span<const double> left, std::span<const double> right) {
     std::vector<double> times;
     times.reserve(left.size() + right.size());
     std::merge(left.begin(), left.end(), right.begin(), right.end(), std::back_inserter(times));
@@ -41,7 +41,8 @@ std::vector<IdleSpan> idleSpansOf(const Track<CursorLocationKind>& positions, co
                                   double duration, const IdleOptions& options) {
     if (positions.empty() && actions.empty() && keys.empty() && scrolling.empty())
         return {};
-    const std::vector<double> input = merged(merged(keys.times(), scrolling.times()), pressesAndReleasesOf(actions));
+    const std::vector<double> input =
+        mergedTimes(mergedTimes(keys.times(), scrolling.times()), pressesAndReleasesOf(actions));
     std::vector<IdleSpan> spans;
     double last = 0;
     const auto endAt = [&](double time) {
@@ -49,7 +50,7 @@ std::vector<IdleSpan> idleSpansOf(const Track<CursorLocationKind>& positions, co
             spans.push_back({last, time});
         last = std::max(last, time);
     };
-    for (const double time : merged(movesOf(positions), input))
+    for (const double time : mergedTimes(timesOfMoves(positions), input))
         endAt(std::min(time, duration));
     endAt(duration);
     return spans;
