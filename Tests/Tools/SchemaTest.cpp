@@ -58,7 +58,7 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
     }
     EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "edits",
                                                         "extract", "grep", "info", "insights", "redact", "repair",
-                                                        "salvage", "stamp", "verify", "view"));
+                                                        "salvage", "stamp", "state", "verify", "view"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
@@ -132,6 +132,16 @@ TEST_F(Schema, HoldsForInsights) {
                  outputOf({"insights", strange, press, written("na\xff.dat", locations())})});
 }
 
+TEST_F(Schema, HoldsForState) {
+    const std::string strange = written("strange.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "\xff"));
+    const std::string cursors = written("cursors.dat", streamHeader("2b7b6af1", 2, 0) + le32(28) + f64(1) + le64(7) +
+                                                           le32(8) + le32(0) + le32(3));
+    std::vector<std::string> documents;
+    for (const std::string& file : {movie(), odd(), torn(), strange, cursors, streamFile("slideText")})
+        documents.push_back(outputOf({"state", file, "--at", "0,0.05,2.5,61/3"}));
+    expectValid(documents);
+}
+
 TEST_F(Schema, HoldsForAttachAndStamp) {
     const std::string tornNames = written("names.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "whole") +
                                                            textEntry(2, "torn").substr(0, 9));
@@ -183,6 +193,7 @@ TEST_F(Schema, HoldsIfNothingCanBeReadOrFound) {
                                                {"verify"},
                                                {"grep", "a"},
                                                {"insights"},
+                                               {"state", "--at", "1"},
                                                {"diff", movie()},
                                                {"extract", "-o", folder / "streams"},
                                                {"salvage", "-o", folder / "streams"},

@@ -38,6 +38,7 @@ zulm_add_tests(ToolsTests
   SalvageCommandTest
   SchemaTest
   StampCommandTest
+  StateCommandTest
   ToolRunTest
   VerifyCommandTest
   ViewCommandTest)

@@ -29,6 +29,7 @@ void addDumpCommand(CLI::App& app, Action& chosen);
 void addInsightsCommand(CLI::App& app, Action& chosen);
 void addDiffCommand(CLI::App& app, Action& chosen);
 void addGrepCommand(CLI::App& app, Action& chosen);
+void addStateCommand(CLI::App& app, Action& chosen);
 void addViewCommand(CLI::App& app, Action& chosen);
 void addVerifyCommand(CLI::App& app, Action& chosen);
 void addAttachCommand(CLI::App& app, Action& chosen);

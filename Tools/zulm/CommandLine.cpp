@@ -28,8 +28,8 @@ struct CommandGroup {
 /// All commands, in the order of the help.
 const std::vector<CommandGroup> s_commandGroups{
     {"Look",
-     {addInfoCommand, addAtomsCommand, addDumpCommand, addInsightsCommand, addDiffCommand, addGrepCommand,
-      addViewCommand}},
+     {addInfoCommand, addAtomsCommand, addDumpCommand, addStateCommand, addInsightsCommand, addDiffCommand,
+      addGrepCommand, addViewCommand}},
     {"Check and rescue", {addVerifyCommand, addRepairCommand, addSalvageCommand}},
     {"Change", {addAttachCommand, addStampCommand, addRedactCommand, addCompactCommand, addDetachCommand}},
     {"Convert", {addExtractCommand, addConvertCommand}},
