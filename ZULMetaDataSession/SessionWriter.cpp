@@ -27,8 +27,8 @@ constexpr auto s_lockNote = "A session is recorded into this folder as long as t
 /// The largest text or picture: sizes of entries have 32 bits, and no entry has more than 64 bytes beside it.
 constexpr std::uint64_t s_largestValue = std::numeric_limits<std::uint32_t>::max() - std::uint64_t{64};
 
-/// A burst is so many readings of the clock in a row that all return the same time. In a burst the clock is not read for
-/// some entries after each reading. No recorder is that fast, but a program that copies a recording is.
+/// A burst is so many readings of the clock in a row that all return the same time. In a burst the clock is not read
+/// for some entries after each reading. No recorder is that fast, but a program that copies a recording is.
 constexpr std::uint32_t s_readingsOfABurst = 4096;
 constexpr std::uint32_t s_unwatchedOfABurst = 7;
 
@@ -401,7 +401,7 @@ std::vector<AbandonedSession> SessionWriter::abandoned(const FileLocation& folde
     std::vector<AbandonedSession> sessions;
     for (const FileLocation& candidate : folders)
         if (LockFile::stateOf(detail::lockFileIn(candidate)) == LockFile::State::Left)
-            sessions.emplace_back(candidate, detail::streamsIn(candidate));
+            sessions.emplace_back(candidate);
     return sessions;
 }
 
