@@ -402,7 +402,7 @@ std::vector<AbandonedSession> SessionWriter::abandoned(const FileLocation& folde
     std::vector<AbandonedSession> sessions;
     for (const FileLocation& candidate : folders)
         if (LockFile::stateOf(detail::lockFileIn(candidate)) == LockFile::State::Left)
-            sessions.emplace_back(candidate, detail::streamsIn(candidate));
+            sessions.emplace_back(candidate);
     return sessions;
 }
 
