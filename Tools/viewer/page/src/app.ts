@@ -33,6 +33,8 @@ export class App implements Page {
   private movieUrl = '';
   private movieName = '';
   private isFramePending = false;
+  private onlyTimeMoves = false;
+  private drawnTime = -1;
   private opened = 0;
   finished = 0;
   private controls!: Controls;
@@ -75,6 +77,7 @@ export class App implements Page {
     byId('notice-close').addEventListener('click', () => void (byId('notice').hidden = true));
     window.addEventListener('hashchange', () => this.followLink());
     this.player.onChange = () => this.playerChanged();
+    this.player.onPicture = () => this.pictureChanged();
     this.stage.images.onDecoded = () => this.requestFrame();
     this.openEmbedded();
   }
@@ -176,8 +179,8 @@ export class App implements Page {
   }
 
   stepFrame(direction: 1 | -1): void {
-    this.player.pause();
-    this.step(direction * this.player.frameLength);
+    this.player.stepFrame(direction);
+    this.timeline.reveal(this.player.time);
   }
 
   stepMarker(direction: 1 | -1): void {
@@ -245,6 +248,12 @@ export class App implements Page {
     this.requestFrame();
   }
 
+  /// Picture and overlay are drawn together, before the browser shows either.
+  private pictureChanged(): void {
+    this.stage.drawPicture();
+    this.frame();
+  }
+
   private tellOfMovie(): void {
     const note = byId('stage-note');
     const { movie } = this.player;
@@ -265,13 +274,17 @@ export class App implements Page {
   }
 
   requestFrame(): void {
+    this.onlyTimeMoves = false;
     if (this.isFramePending) return;
     this.isFramePending = true;
     requestAnimationFrame((now) => {
       this.isFramePending = false;
       this.player.tick(now);
-      this.frame();
-      if (this.player.playing) this.requestFrame();
+      if (this.drawnTime !== this.player.time || !this.onlyTimeMoves) this.frame();
+      this.onlyTimeMoves = false;
+      if (!this.player.playing) return;
+      this.requestFrame();
+      this.onlyTimeMoves = true;
     });
   }
 
@@ -279,6 +292,7 @@ export class App implements Page {
     if (!this.session) return;
     measured('zulm:frame', () => {
       const { time, playing } = this.player;
+      this.drawnTime = time;
       if (playing) this.timeline.reveal(time);
       this.stage.draw(time);
       this.timeline.draw(time);

@@ -159,6 +159,7 @@ test('links tell a time', () => {
   assert.equal(timeInLink('#t=abc'), undefined);
   assert.equal(timeInLink(''), undefined);
   assert.equal(linkTo(12.5000001), '#t=12.5');
+  assert.equal(linkTo(1.533334), '#t=1.533334', 'the picture after the one of 1.533');
 });
 
 test('numbers and times in words', () => {

@@ -35,6 +35,7 @@ export class Stage {
   private width = 0;
   private readonly element = byId('stage');
   private readonly frame = byId('frame');
+  private readonly picture = byId<HTMLCanvasElement>('picture');
   private readonly canvas = byId<HTMLCanvasElement>('overlay');
   private readonly caption = byId('caption');
 
@@ -69,9 +70,20 @@ export class Stage {
     });
     this.width = place.width;
     this.frame.classList.toggle('has-movie', movie === 'ready');
+    fitCanvas(this.picture, place.width, place.height);
     fitCanvas(this.canvas, place.width, place.height);
+    this.drawPicture();
     this.shownCaption = '';
     this.draw(this.player.time);
+  }
+
+  /// Draws the movie's picture onto a canvas: the browser shows both canvases at once, but the movie itself when it likes.
+  drawPicture(): void {
+    const { video, movie } = this.player;
+    if (movie !== 'ready' || !('requestVideoFrameCallback' in video)) return void (this.picture.hidden = true);
+    if (video.readyState < HTMLMediaElement.HAVE_CURRENT_DATA) return; // the picture before stays
+    this.picture.hidden = false;
+    this.picture.getContext('2d', { alpha: false })?.drawImage(video, 0, 0, this.picture.width, this.picture.height);
   }
 
   /// The heat map tells of this range of time.
