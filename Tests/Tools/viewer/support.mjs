@@ -96,7 +96,8 @@ after(() => browser?.close());
 export async function open(path, { size = [1280, 800], theme = 'dark', hash = '', ...more } = {}) {
   browser ??= await chromium.launch({
     executablePath: process.env.CHROMIUM ?? '/usr/bin/chromium',
-    args: ['--no-sandbox', '--disable-gpu', '--force-color-profile=srgb', '--hide-scrollbars'],
+    args: ['--no-sandbox', '--disable-gpu', '--force-color-profile=srgb'],
+    ignoreDefaultArgs: ['--hide-scrollbars'], // readers see them
   });
   const [width, height] = size;
   const context = await browser.newContext({ viewport: { width, height }, colorScheme: theme, ...more });

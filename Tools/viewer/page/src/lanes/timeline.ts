@@ -42,6 +42,12 @@ export class Timeline {
     'aria-valuemin': 0,
   });
   private readonly body = make('div', { class: 'lanes-body' });
+  private readonly scroller = make(
+    'div',
+    { class: 'lanes-scroll', tabindex: 0, role: 'group', 'aria-label': 'Lanes' },
+    this.labels,
+    this.body,
+  );
   private readonly playhead = make('div', { class: 'playhead', 'aria-hidden': 'true' });
   private readonly pointerLine = make('div', { class: 'pointer-line', 'aria-hidden': 'true', hidden: true });
   private readonly tip = make('output', { class: 'tip', 'aria-live': 'off', hidden: true });
@@ -55,7 +61,7 @@ export class Timeline {
       move: (x) => this.events.onSeek(this.timeAt(x)),
     });
     this.setUpLanes();
-    new ResizeObserver(() => this.invalidate()).observe(this.body);
+    new ResizeObserver(() => this.resized()).observe(this.body);
   }
 
   private build(): void {
@@ -81,16 +87,10 @@ export class Timeline {
     );
     this.ruler.append(this.rulerCanvas);
     this.body.append(this.lanesCanvas);
-    const scroll = make(
-      'div',
-      { class: 'lanes-scroll', tabindex: 0, role: 'group', 'aria-label': 'Lanes' },
-      this.labels,
-      this.body,
-    );
     root.append(
       make('div', { class: 'timeline-row' }, tools, this.overview.element),
       make('div', { class: 'timeline-row' }, make('div', { class: 'ruler-label' }, 'Time'), this.ruler),
-      scroll,
+      this.scroller,
       make('div', { class: 'playhead-holder', 'aria-hidden': 'true' }, this.pointerLine, this.playhead),
       this.tip,
     );
@@ -162,6 +162,13 @@ export class Timeline {
     const { from, to } = this.range;
     const length = to - from;
     if (time < from || time > to) this.setRange({ from: time - length * 0.1, to: time + length * 0.9 });
+  }
+
+  /// What stands above the lanes is as wide as they are, beside their scroll bar.
+  private resized(): void {
+    const bar = this.scroller.offsetWidth - this.scroller.clientWidth;
+    byId('timeline').style.setProperty('--scroll-bar', `${bar}px`);
+    this.invalidate();
   }
 
   invalidate(): void {
