@@ -4,7 +4,8 @@ import assert from 'node:assert/strict';
 import { readdirSync, readFileSync, writeFileSync } from 'node:fs';
 import { join } from 'node:path';
 import { test } from 'node:test';
-import { emptyPage, folder, open, opened, recordedSession, setting, state, textOf, zulm } from './support.mjs';
+import { attached, ffmpeg, positionsOf, regionOf } from './numbered.mjs';
+import { emptyPage, folder, open, opened, ready, recordedSession, setting, state, textOf, zulm } from './support.mjs';
 
 const recording = recordedSession();
 const empty = join(folder, 'empty.html');
@@ -98,5 +99,76 @@ test('every damaged file is shown or refused, and the page lives on', async () =
     problems.filter((problem) => !/movie|media|ERR_/i.test(problem)),
     [],
   );
+  await close();
+});
+
+/// A grey movie of 8 seconds with these streams, by page and as a file.
+function greyMovie(name, streams) {
+  const plain = join(folder, 'grey.mp4');
+  const picture = ['-f', 'lavfi', '-i', 'color=c=gray:s=640x360:r=10', '-t', '8', '-pix_fmt', 'yuv420p'];
+  ffmpeg(...picture, '-c:v', 'libx264', '-preset', 'ultrafast', plain);
+  return attached(name, plain, streams);
+}
+
+async function findings(page) {
+  await page.getByRole('tab', { name: /^Check/ }).click();
+  await page.locator('.verdict').waitFor();
+  return (await page.locator('.finding').allInnerTexts()).join('\n');
+}
+
+const path = Array.from({ length: 80 }, (_, i) => [i / 10, 8 * i, 4 * i]);
+
+test('one bad time does not stretch the axis, and is told', async () => {
+  const bad = [...path, [1e9, 5, 5], [-5, 5, 5]];
+  const recording = greyMovie('Bad', { cursorLocation: positionsOf(bad), recordingRegion: regionOf([0, 0, 0, 640, 360]) });
+  for (const file of [recording.page, empty]) {
+    const { page, close } = await open(file);
+    if (file === empty) await give(page, recording.movie);
+    await opened(page);
+    await ready(page);
+    assert.equal((await state(page)).duration, 8);
+    assert.equal(await page.locator('.ruler').getAttribute('aria-valuemax'), '8.000');
+    const told = await findings(page);
+    assert.match(told, /1 entry lies after the end of the movie/);
+    assert.match(told, /1 entry lies before the beginning of the movie/);
+    assert.match(await textOf(page, '.verdict'), /Nothing is damaged\./);
+    await close();
+  }
+  const { page, close } = await open(empty);
+  await give(page, join(folder, 'Bad/cursorLocation.dat')); // no movie says how long it is
+  await opened(page);
+  const { duration } = await state(page);
+  assert.ok(duration >= 7.9 && duration < 8, `${duration} seconds`);
+  assert.match(await findings(page), /1 entry lies [\d,]+ seconds after all others/);
+  await close();
+});
+
+test('regions that cannot be right are told', async () => {
+  const told = async (name, regions) => {
+    const streams = { cursorLocation: positionsOf(path), ...(regions && { recordingRegion: regionOf(...regions) }) };
+    const { page, close } = await open(greyMovie(name, streams).page);
+    await opened(page);
+    await ready(page);
+    const text = await findings(page);
+    await close();
+    return text;
+  };
+  assert.equal(await told('Right', [[0, 0, 0, 1280, 720]]), '');
+  assert.match(await told('Square', [[0, 0, 0, 640, 640]]), /The region of 640 × 640 has another shape than the movie of 640 × 360/);
+  assert.match(
+    await told('Two', [[0, 0, 0, 640, 360], [3, 0, 0, 1280, 720]]),
+    /2 different regions were recorded\. The page uses the last one, 1,280 × 720 at 0, 0/,
+  );
+  assert.match(await told('Without', undefined), /No region was recorded/);
+});
+
+test('a stream alone claims no region, and its stage and lane agree', async () => {
+  greyMovie('Alone', { cursorLocation: positionsOf(path) });
+  const { page, close } = await open(empty);
+  await give(page, join(folder, 'Alone/cursorLocation.dat'));
+  await opened(page);
+  assert.equal(await textOf(page, '#stage-note'), 'There is no movie with this recording. The page assumes a screen of 1,920 × 1,080.');
+  assert.deepEqual((await state(page)).frame, { width: 1920, height: 1080 });
+  assert.match(await findings(page), /No region was recorded/);
   await close();
 });

@@ -205,6 +205,7 @@ test('keys go to frames, markers and the ends', async () => {
   await opened(page);
   const timeAfter = async (key) => {
     await page.keyboard.press(key);
+    await page.waitForFunction(() => zulmViewer.state().isSettled);
     return (await state(page)).time;
   };
   assert.equal(await timeAfter(']'), 1.5);
@@ -212,8 +213,8 @@ test('keys go to frames, markers and the ends', async () => {
   assert.equal(await timeAfter('['), 1.5);
   assert.equal(await timeAfter('ArrowRight'), 2.5);
   assert.equal(await timeAfter('ArrowLeft'), 1.5);
-  assert.ok(Math.abs((await timeAfter('.')) - 1.5 - 1 / 30) < 1e-9);
-  assert.ok(Math.abs((await timeAfter(',')) - 1.5) < 1e-9);
+  assert.ok(Math.abs((await timeAfter('.')) - 1.5 - 1 / 30) < 1e-5); // browsers round times of pictures
+  assert.ok(Math.abs((await timeAfter(',')) - 1.5) < 1e-5);
   assert.equal(await timeAfter('Home'), 0);
   assert.ok((await timeAfter('End')) >= 19.9);
   await page.keyboard.press('?');

@@ -5,6 +5,7 @@ import { embeddedRecording, type EmbeddedRecording } from './decoder/embedded';
 import { EntriesPane } from './entries/pane';
 import { showCheck, showFacts } from './facts/pane';
 import { Timeline } from './lanes/timeline';
+import { assumption } from './model/checks';
 import { clock } from './model/format';
 import { markerAfter, markerBefore } from './model/markers';
 import { Session, type Decoded } from './model/session';
@@ -34,6 +35,7 @@ export class App implements Page {
   private movieName = '';
   private isFramePending = false;
   private onlyTimeMoves = false;
+  private shownMovie = '';
   private drawnTime = -1;
   private opened = 0;
   finished = 0;
@@ -45,6 +47,7 @@ export class App implements Page {
     const showsKeys = () => this.stage.showsKeys;
     this.timeline = new Timeline({
       showsKeys,
+      region: () => this.stage.placement.region,
       onSeek: (time) => this.seek(time),
       onRange: ({ from, to }) => {
         this.stage.setHeatRange(from, to);
@@ -147,7 +150,7 @@ export class App implements Page {
     document.title = `${session.name} – ZULMetaData`;
     setText(byId('recording-name'), session.name);
     const canHavePictures = session.container !== 'stream';
-    this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration);
+    this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration, session.movieDuration === undefined);
     this.stage.show(session);
     this.timeline.show(session, this.player.duration);
     this.followLink();
@@ -161,7 +164,7 @@ export class App implements Page {
     if (session !== this.session) return;
     this.entries.show(session);
     showFacts(session, this.player.duration);
-    showCheck(session);
+    showCheck(session, this.player.size);
     this.requestFrame();
     void this.stage.images.prepare(session.appearances);
     announce(`${session.name} is open`);
@@ -240,8 +243,14 @@ export class App implements Page {
   }
 
   private playerChanged(): void {
-    if (this.session) this.timeline.setDuration(this.player.duration);
+    const { session, player } = this;
+    if (session) this.timeline.setDuration(player.duration);
     this.stage.lay();
+    if (session && player.movie !== this.shownMovie) {
+      this.shownMovie = player.movie;
+      this.timeline.invalidate(); // the movie may show another part of the screen
+      showCheck(session, player.size);
+    }
     this.controls.showState();
     this.tellOfMovie();
     this.writeLink();
@@ -265,7 +274,8 @@ export class App implements Page {
         : this.movieUrl.startsWith('blob:')
           ? `This browser can show no pictures of ${name}.`
           : `${name} is not beside this page, or has no pictures that this browser can show.`;
-    setText(note, `${reason} The recorded region stands for it.`);
+    const stand = this.session?.region ? 'The recorded region stands for it.' : assumption(undefined);
+    setText(note, `${reason} ${stand}`);
   }
 
   complain(text: string): void {

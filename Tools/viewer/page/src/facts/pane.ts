@@ -1,7 +1,9 @@
 // What is known of a recording as a whole, and what is wrong with it.
 
 import type { StreamSummary } from '#decoder';
+import { doubtsAbout } from '../model/checks';
 import { brief, bytes, clock, count, plural, titleOf } from '../model/format';
+import type { Size } from '../model/geometry';
 import { idleTime } from '../model/idle';
 import type { Finding, Session } from '../model/session';
 import { byId, make } from '../ui/dom';
@@ -130,9 +132,9 @@ function sentence(finding: Finding): string {
   return typeof text === 'string' ? text : JSON.stringify(finding);
 }
 
-/// What `verify` found.
-export function showCheck(session: Session): void {
-  const findings = allFindings(session);
+/// What `verify` found, and what else is doubtful.
+export function showCheck(session: Session, movie: Size | undefined): void {
+  const findings = [...allFindings(session), ...doubtsAbout(session, movie)];
   const isDamaged = session.verify.damaged === true;
   const verdict = make(
     'p',

@@ -4,6 +4,7 @@ import { clickLabel, type Click } from '../model/clicks';
 import { StreamRows } from '../entries/rows';
 import { brief, titleOf } from '../model/format';
 import { keyCap } from '../model/keys';
+import type { Rect } from '../model/geometry';
 import { countBefore, countUntil, lastAt } from '../model/search';
 import { rectAt, type HiddenStream, type Session } from '../model/session';
 import type { Track } from '../model/track';
@@ -13,6 +14,8 @@ import { drawArea, drawBands, drawDensity, drawLine, type Curve, type Lane, type
 
 export interface LaneOptions {
   showsKeys: () => boolean;
+  /// What of the screen the movie shows.
+  region: () => Rect;
 }
 
 export function lanesOf(session: Session, options: LaneOptions): Lane[] {
@@ -25,7 +28,7 @@ export function lanesOf(session: Session, options: LaneOptions): Lane[] {
     keyLane(session, options),
     scrollLane(session),
     speedLane(session),
-    trailLane(session),
+    trailLane(session, options),
     hoverLane(session),
     opacityLane(session),
     cpuLane(session),
@@ -313,28 +316,19 @@ function curveOf(track: Track, values: Float32Array, low: number, high: number):
   return { times: track.times, extremes: new Extremes(values), low, high };
 }
 
-function trailLane(session: Session): Lane | undefined {
+function trailLane(session: Session, { region }: LaneOptions): Lane | undefined {
   const track = filled(session, 'cursorLocation');
   if (!track) return undefined;
-  const region = session.region ?? { x: 0, y: 0, width: 1920, height: 1080 };
-  const x = curveOf(
-    track,
-    valuesOf(track, (i) => track.number('x', i)),
-    region.x,
-    region.x + region.width,
-  );
-  const y = curveOf(
-    track,
-    valuesOf(track, (i) => -track.number('y', i)),
-    -(region.y + region.height),
-    -region.y,
-  );
+  const xs = new Extremes(valuesOf(track, (i) => track.number('x', i)));
+  const ys = new Extremes(valuesOf(track, (i) => -track.number('y', i)));
   return {
     title: 'Cursor x, y',
     height: 32,
     draw: (canvas) => {
-      drawLine(canvas, x, canvas.palette.accent);
-      drawLine(canvas, y, canvas.palette.second);
+      const { x, y, width, height } = region();
+      const { times } = track;
+      drawLine(canvas, { times, extremes: xs, low: x, high: x + width }, canvas.palette.accent);
+      drawLine(canvas, { times, extremes: ys, low: -(y + height), high: -y }, canvas.palette.second);
     },
     valueAt: (time) => {
       const index = track.at(time);

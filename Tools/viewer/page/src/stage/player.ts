@@ -1,5 +1,6 @@
 // Time that goes on: by the pictures of the movie where there is one, by the clock where there is none or it has ended.
 
+import type { Size } from '../model/geometry';
 import { FrameLengths, inside, nextFrame, previousFrame } from './frames';
 
 export type MovieState = 'none' | 'loading' | 'ready' | 'failed';
@@ -19,6 +20,7 @@ export class Player {
   private position = 0;
   private lastTick = 0;
   private length = 0;
+  private isGuessed = false;
   private speed = 1;
   private lengths = new FrameLengths();
   /// When the picture that is shown begins; NaN until there is one.
@@ -44,9 +46,10 @@ export class Player {
     video.addEventListener('loadeddata', () => this.onChange());
   }
 
-  /// `duration` is what the metadata lasts; a longer movie makes it more.
-  load(url: string | null, duration: number): void {
+  /// `duration` is what the movie says that it lasts, or what the metadata lasts if `isGuessed`.
+  load(url: string | null, duration: number, isGuessed: boolean): void {
     this.pause();
+    this.isGuessed = isGuessed;
     [this.position, this.length, this.steps, this.followsPicture] = [0, duration, 0, false];
     ++this.journeys;
     [this.lengths, this.picture] = [new FrameLengths(), NaN];
@@ -59,7 +62,14 @@ export class Player {
   }
 
   get duration(): number {
-    return Math.max(this.length, this.movieLength());
+    const length = this.movieLength();
+    return this.isGuessed && length > 0 ? length : Math.max(this.length, length);
+  }
+
+  /// The size of the movie's pictures, where they can be shown.
+  get size(): Size | undefined {
+    const { videoWidth: width, videoHeight: height } = this.video;
+    return this.movie === 'ready' ? { width, height } : undefined;
   }
 
   get time(): number {

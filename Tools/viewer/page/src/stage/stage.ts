@@ -1,6 +1,6 @@
 // The movie, and what was recorded drawn over it.
 
-import { fitted, placementOf, type Placement, type Size } from '../model/geometry';
+import { fitted, placementOf, type Placement } from '../model/geometry';
 import { heatHeight, heatOf, heatWidth } from '../model/heat';
 import { captionAt, captionText, keyCap, type CaptionPart } from '../model/keys';
 import type { Session } from '../model/session';
@@ -54,9 +54,7 @@ export class Stage {
   /// Gives the frame the shape of the movie, or of the recorded region where there is none.
   lay(): void {
     if (!this.session) return;
-    const { video, movie } = this.player;
-    const size: Size | undefined =
-      movie === 'ready' ? { width: video.videoWidth, height: video.videoHeight } : undefined;
+    const { movie, size } = this.player;
     this.placement = placementOf(this.session.region, this.session.scaleFactor, size);
     const place = fitted(this.placement.frame, {
       width: this.element.clientWidth,
