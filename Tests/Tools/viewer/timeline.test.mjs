@@ -1,8 +1,10 @@
 // The timeline: one axis of time for everything in it, with scroll bars as readers have them.
 
 import assert from 'node:assert/strict';
+import { join } from 'node:path';
 import { test } from 'node:test';
-import { open, opened, ready, recordedSession, state, textOf } from './support.mjs';
+import { attached, ffmpeg, positionsOf } from './numbered.mjs';
+import { folder, open, opened, ready, recordedSession, seek, state, textOf } from './support.mjs';
 
 const recording = recordedSession();
 
@@ -42,3 +44,22 @@ test('ruler, overview and lanes have one axis', () =>
     for (const place of places)
       assert.ok(Math.abs(place - boxes.ruler.x - (boxes.ruler.width * 18) / 20) < 1, `a playhead is at ${place}`);
   }));
+
+test('a cursor that rests has no speed', async () => {
+  const moving = Array.from({ length: 60 }, (_, i) => [i / 60, 10 * i, 100]);
+  const again = Array.from({ length: 60 }, (_, i) => [11 + i / 60, 600 - 10 * i, 300]);
+  const plain = join(folder, 'rest-plain.mp4');
+  ffmpeg('-f', 'lavfi', '-i', 'color=c=gray:s=640x360:r=10', '-t', '12', '-pix_fmt', 'yuv420p', plain);
+  const rested = attached('Rest', plain, { cursorLocation: positionsOf([...moving, ...again]) });
+  const { page, close } = await open(rested.page);
+  await opened(page);
+  const speedAt = async (time) => {
+    await seek(page, time);
+    return textOf(page, '.lane-label:has-text("Cursor speed") .lane-value');
+  };
+  assert.equal(await speedAt(0.5), '600 px/s');
+  assert.equal(await speedAt(5), '0 px/s');
+  assert.equal(await speedAt(10.9), '0 px/s');
+  assert.equal(await speedAt(11.5), '600 px/s');
+  await close();
+});

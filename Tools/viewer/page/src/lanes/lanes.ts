@@ -297,16 +297,16 @@ function drawScroll(canvas: LaneCanvas, times: Float64Array, extremes: Extremes,
 }
 
 function speedLane(session: Session): Lane | undefined {
-  const track = filled(session, 'cursorLocation');
-  if (!track) return undefined;
-  const values = session.speeds;
-  const curve = curveOf(track, values.map(Math.sqrt), 0, Math.sqrt(usualGreatest(values)));
+  if (!filled(session, 'cursorLocation')) return undefined;
+  const { times, values } = session.speed;
+  const extremes = new Extremes(values.map(Math.sqrt));
+  const curve = { times, extremes, low: 0, high: Math.sqrt(usualGreatest(values)) };
   return {
     title: 'Cursor speed',
     height: 30,
     draw: (canvas) => drawArea(canvas, curve, canvas.palette.accent, 0.28),
     valueAt: (time) => {
-      const index = track.at(time);
+      const index = lastAt(times, time);
       return index >= 0 ? `${Math.round(values[index]!)} px/s` : '';
     },
   };

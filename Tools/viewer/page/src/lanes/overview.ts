@@ -36,9 +36,8 @@ export class Overview {
 
   show(session: Session, duration: number): void {
     if (session !== this.session) {
-      const track = session.track('cursorLocation');
-      const values = session.speeds.map(Math.sqrt);
-      this.curve = track && { times: track.times, extremes: new Extremes(values), low: 0, high: 70 };
+      const { times, values } = session.speed;
+      this.curve = { times, extremes: new Extremes(values.map(Math.sqrt)), low: 0, high: 70 };
     }
     [this.session, this.duration, this.isStale] = [session, duration, true];
   }

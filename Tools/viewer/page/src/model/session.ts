@@ -6,7 +6,7 @@ import { clicksOf, type Click } from './clicks';
 import { hasArea, type Point, type Rect } from './geometry';
 import { idleStretches, type Stretch } from './idle';
 import { markersOf } from './markers';
-import { speeds } from './speed';
+import { speedOf, type Speed } from './speed';
 import { Track } from './track';
 
 export interface Finding {
@@ -75,8 +75,8 @@ export class Session {
   readonly clicks: Click[];
   readonly markers: Float64Array;
   readonly idle: Stretch[];
-  /// Of the cursor, for each of its positions.
-  readonly speeds: Float32Array;
+  /// Of the cursor.
+  readonly speed: Speed;
   private readonly tracks = new Map<string, Track>();
   private readonly clearKeys: Track | undefined;
   private readonly maskedKeys: Track | undefined;
@@ -106,7 +106,7 @@ export class Session {
     this.clicks = clicksOf(this.track('cursorAction'), this.duration);
     this.markers = markersOf(this);
     this.idle = idleStretches(this);
-    this.speeds = speeds(this.track('cursorLocation'));
+    this.speed = speedOf(this.track('cursorLocation'));
   }
 
   track(kind: string): Track | undefined {
