@@ -71,7 +71,9 @@ test('scrubbing, zooming and panning an hour take little script', async () => {
 
   const lanes = await page.locator('.lanes-body').boundingBox();
   await page.mouse.move(lanes.x + lanes.width / 2, lanes.y + 60);
+  await page.keyboard.down('Control');
   for (let i = 0; i < 60; ++i) await page.mouse.wheel(0, i < 40 ? -100 : 60);
+  await page.keyboard.up('Control');
   await page.waitForTimeout(200);
   check('zooming', await scripts(page));
 
@@ -91,6 +93,10 @@ test('a table of a million entries scrolls and finds', async () => {
   assert.ok(count > 1_000_000, `${count} entries`);
   const table = await page.locator('.table').boundingBox();
   await page.mouse.move(table.x + 50, table.y + 100);
+  const firstRow = () => page.evaluate(() => Number(document.querySelector('.table-row').dataset.row));
+  for (let i = 0; i < 50; ++i) await page.mouse.wheel(0, 72);
+  await page.waitForFunction(() => Number(document.querySelector('.table-row').dataset.row) >= 140);
+  assert.equal(await firstRow(), 50 * 3 - 4, 'a notch moves as many rows as it is high, as in a short table');
   for (let i = 0; i < 60; ++i) await page.mouse.wheel(0, 40 * 1.25 ** (i % 50));
   await page.waitForTimeout(200);
   check('scrolling a million entries', await scripts(page, 'zulm:table'));

@@ -63,3 +63,37 @@ test('a cursor that rests has no speed', async () => {
   assert.equal(await speedAt(11.5), '600 px/s');
   await close();
 });
+
+test('the wheel scrolls the lanes, and with Control it zooms them; the tip stays true', () =>
+  inLowWindow(async (page) => {
+    const box = await page.locator('.lanes-scroll').boundingBox();
+    const top = () => page.evaluate(() => document.querySelector('.lanes-scroll').scrollTop);
+    await page.mouse.move(box.x + box.width * 0.7, box.y + 30);
+    await page.mouse.wheel(0, 60);
+    await page.waitForFunction(() => document.querySelector('.lanes-scroll').scrollTop > 20);
+    assert.equal(await textOf(page, '.zoom-text'), 'all');
+    await page.mouse.move(box.x + box.width * 0.7, box.y + 32);
+    const before = await textOf(page, '.tip b');
+    const scrolled = await top();
+    await page.keyboard.down('Control');
+    await page.mouse.wheel(0, -400);
+    await page.keyboard.up('Control');
+    await page.waitForFunction(() => document.querySelector('.zoom-text').textContent !== 'all');
+    assert.equal(await top(), scrolled);
+    assert.equal(await textOf(page, '.tip b'), before, 'what is below the pointer stays there');
+    await page.keyboard.press('0');
+    await page.keyboard.press('Home');
+    for (let i = 0; i < 3; ++i) await page.keyboard.press('+');
+    await page.waitForTimeout(50);
+    assert.notEqual(await textOf(page, '.tip b'), before, 'another time is below the pointer');
+  }));
+
+test('the wheel over the lanes scrolls a narrow page', async () => {
+  const { page, close } = await open(recording.page, { size: [360, 740] });
+  await opened(page);
+  const box = await page.locator('.lanes-body').boundingBox();
+  await page.mouse.move(box.x + 100, box.y + 40);
+  await page.mouse.wheel(0, 200);
+  await page.waitForFunction(() => scrollY > 100);
+  await close();
+});

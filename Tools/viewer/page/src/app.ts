@@ -109,6 +109,7 @@ export class App implements Page {
     const url = URL.createObjectURL(file);
     await this.open(file, file.name, (decoded) => {
       this.setMovie(url, file.name);
+      history.replaceState(null, '', linkTo(0)); // the address told a time of the recording before
       return decoded;
     });
     if (this.movieUrl !== url) URL.revokeObjectURL(url);

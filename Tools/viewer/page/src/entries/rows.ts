@@ -74,6 +74,7 @@ export class StreamRows implements Rows {
 
   value(row: number, name: string): CellValue | undefined {
     if (name === 'timestamp') return plain(this.time(row));
+    if (name === 'kind') return this.track.kind;
     const column = this.track.entries.columns[name];
     if (!column) return undefined;
     return isMasked(this.track.kind, name, this.showsKeys()) ? mask : plain(column[row]);

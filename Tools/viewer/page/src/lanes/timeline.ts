@@ -51,6 +51,8 @@ export class Timeline {
   private readonly playhead = make('div', { class: 'playhead', 'aria-hidden': 'true' });
   private readonly pointerLine = make('div', { class: 'pointer-line', 'aria-hidden': 'true', hidden: true });
   private readonly tip = make('output', { class: 'tip', 'aria-live': 'off', hidden: true });
+  /// Where the pointer rests.
+  private pointed: PointerEvent | undefined;
   private readonly zoomText = make('span', { class: 'zoom-text' });
 
   constructor(private readonly events: TimelineEvents) {
@@ -181,7 +183,10 @@ export class Timeline {
   /// Only the playhead moves, until the range is another one.
   draw(time: number): void {
     if (!this.session) return;
-    if (this.isStale) this.drawLanes();
+    if (this.isStale) {
+      this.drawLanes();
+      if (this.pointed) this.point(this.pointed);
+    }
     this.overview.draw(this.range, time);
     this.time = time;
     if (time === this.shownTime) return;
@@ -284,29 +289,38 @@ export class Timeline {
     for (const element of [this.body, this.ruler, this.overview.element])
       element.addEventListener('wheel', (event) => this.wheel(event), { passive: false });
     this.body.addEventListener('pointermove', (event) => this.point(event));
-    this.body.addEventListener('pointerleave', () => void (this.pointerLine.hidden = this.tip.hidden = true));
+    this.body.addEventListener('pointerleave', () => this.pointNowhere());
+    this.scroller.addEventListener('scroll', () => this.pointed && this.point(this.pointed));
   }
 
+  /// Alone it scrolls what the browser scrolls.
   private wheel(event: WheelEvent): void {
-    event.preventDefault();
     const lines = event.deltaMode === WheelEvent.DOM_DELTA_LINE ? 16 : 1;
-    const isPan = event.shiftKey || Math.abs(event.deltaX) > Math.abs(event.deltaY);
+    const isZoom = event.ctrlKey || event.metaKey;
+    const isPan = !isZoom && (event.shiftKey || Math.abs(event.deltaX) > Math.abs(event.deltaY));
+    if (!isZoom && !isPan) return;
+    event.preventDefault();
     if (isPan) {
       const way = (event.deltaX || event.deltaY) * lines;
       const shift = (way / Math.max(1, this.width)) * (this.range.to - this.range.from);
       return this.setRange({ from: this.range.from + shift, to: this.range.to + shift });
     }
     const x = event.clientX - this.body.getBoundingClientRect().left;
-    const strength = event.ctrlKey ? 0.01 : 0.0022;
+    const strength = Math.abs(event.deltaY) < 40 ? 0.01 : 0.0022; // fingers on a trackpad, or a notch
     const isOverview = event.currentTarget === this.overview.element;
     const anchor = isOverview ? (x / Math.max(1, this.width)) * this.duration : this.timeAt(x);
     this.setRange(zoomed(this.range, anchor, Math.exp(event.deltaY * lines * strength), this.duration));
   }
 
+  private pointNowhere(): void {
+    this.pointed = undefined;
+    this.pointerLine.hidden = this.tip.hidden = true;
+  }
+
   /// What the lane under the pointer tells at that time.
   private point(event: PointerEvent): void {
-    if (event.pointerType === 'touch' || event.buttons !== 0)
-      return void (this.pointerLine.hidden = this.tip.hidden = true);
+    if (event.pointerType === 'touch' || event.buttons !== 0) return this.pointNowhere();
+    this.pointed = event;
     const box = this.body.getBoundingClientRect();
     const x = event.clientX - box.left;
     const y = (event.clientY - box.top) / uiScale();
