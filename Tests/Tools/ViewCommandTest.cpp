@@ -70,6 +70,8 @@ TEST_F(ViewCommand, PutsWhatIsKnownOfARecordingIntoThePage) {
     EXPECT_EQ(recording.at("schema"), "zulm.view");
     EXPECT_EQ(recording.at("schema_version"), 1);
     EXPECT_EQ(recording.at("name"), std::filesystem::path(movie()).filename().string());
+    EXPECT_EQ(recording.at("info").at("path"), recording.at("name")); // nobody is told where the recording lay
+    EXPECT_EQ(recording.at("verify").at("path"), recording.at("name"));
     EXPECT_EQ(recording.at("info"), reportOf("info", movie()));
     EXPECT_EQ(recording.at("verify"), reportOf("verify", movie()));
 }

@@ -6,7 +6,7 @@ import { EntriesPane } from './entries/pane';
 import { showCheck, showFacts } from './facts/pane';
 import { Timeline } from './lanes/timeline';
 import { assumption } from './model/checks';
-import { clock } from './model/format';
+import { clock, shown } from './model/format';
 import { markerAfter, markerBefore } from './model/markers';
 import { Session, type Decoded } from './model/session';
 import { timeInLink, linkTo } from './model/link';
@@ -148,8 +148,8 @@ export class App implements Page {
   private show(session: Session): void {
     this.session = session;
     document.body.classList.remove('is-empty');
-    document.title = `${session.name} – ZULMetaData`;
-    setText(byId('recording-name'), session.name);
+    document.title = `${shown(session.name)} – ZULMetaData`;
+    setText(byId('recording-name'), shown(session.name));
     const canHavePictures = session.container !== 'stream';
     this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration, session.movieDuration === undefined);
     this.stage.show(session);
@@ -168,7 +168,7 @@ export class App implements Page {
     showCheck(session, this.player.size);
     this.requestFrame();
     void this.stage.images.prepare(session.appearances);
-    announce(`${session.name} is open`);
+    announce(`${shown(session.name)} is open`);
   }
 
   // Time
@@ -276,11 +276,11 @@ export class App implements Page {
           ? `This browser can show no pictures of ${name}.`
           : `${name} is not beside this page, or has no pictures that this browser can show.`;
     const stand = this.session?.region ? 'The recorded region stands for it.' : assumption(undefined);
-    setText(note, `${reason} ${stand}`);
+    setText(note, shown(`${reason} ${stand}`));
   }
 
   complain(text: string): void {
-    setText(byId('notice-text'), text);
+    setText(byId('notice-text'), shown(text));
     byId('notice').hidden = false;
   }
 

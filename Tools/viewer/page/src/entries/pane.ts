@@ -5,7 +5,7 @@ import { partition } from '../model/search';
 import type { HiddenStream, Session } from '../model/session';
 import { announce, byId, make, setText } from '../ui/dom';
 import { setIcon } from '../ui/icons';
-import { asCSV, asJSON, copyText } from './copy';
+import { asCSV, asJSON, copyable, copyText } from './copy';
 import { filterRows, testOf } from './filter';
 import { AllRows, StreamRows, type Rows } from './rows';
 import { Table } from './table';
@@ -206,7 +206,7 @@ export class EntriesPane {
     if (!this.rows || !event.clipboardData || this.table.selectedCount > mostCopied) return;
     const rows = [...this.table.wantedHere()];
     if (rows.length === 0) return;
-    event.clipboardData.setData('text/plain', asCSV(this.rows, rows));
+    event.clipboardData.setData('text/plain', copyable(asCSV(this.rows, rows)));
     event.preventDefault();
     setText(this.status, `${plural(rows.length, 'entry', 'entries')} copied as CSV`);
   }

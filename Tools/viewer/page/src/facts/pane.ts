@@ -2,7 +2,7 @@
 
 import type { StreamSummary } from '#decoder';
 import { doubtsAbout } from '../model/checks';
-import { brief, bytes, clock, count, plural, titleOf } from '../model/format';
+import { brief, bytes, clock, count, plural, shown, titleOf } from '../model/format';
 import type { Size } from '../model/geometry';
 import { idleTime } from '../model/idle';
 import type { Finding, Session } from '../model/session';
@@ -16,7 +16,7 @@ function section(title: string, ...content: Node[]): HTMLElement {
 }
 
 function list(facts: Fact[]): HTMLElement {
-  return make('dl', {}, ...facts.flatMap(([name, value]) => [make('dt', {}, name), make('dd', {}, value)]));
+  return make('dl', {}, ...facts.flatMap(([name, value]) => [make('dt', {}, shown(name)), make('dd', {}, shown(value))]));
 }
 
 export function showFacts(session: Session, duration: number): void {
@@ -160,8 +160,8 @@ export function showCheck(session: Session, movie: Size | undefined): void {
     return make(
       'li',
       { class: `finding is-${finding.severity ?? 'notice'}` },
-      make('p', { class: 'quiet' }, place),
-      make('p', {}, sentence(finding)),
+      make('p', { class: 'quiet' }, shown(place)),
+      make('p', {}, shown(sentence(finding))),
     );
   });
   byId('pane-verify').replaceChildren(
@@ -171,6 +171,7 @@ export function showCheck(session: Session, movie: Size | undefined): void {
   );
   const badge = byId('finding-count');
   badge.hidden = findings.length === 0;
+  badge.classList.toggle('is-bad', isDamaged);
   badge.textContent = String(findings.length);
 }
 

@@ -52,6 +52,17 @@ export function titleOf(kind: string): string {
   return words.charAt(0).toUpperCase() + words.slice(1);
 }
 
+/// A text as it is shown: signs that turn the direction of what follows, or that are not seen, show themselves.
+export function shown(text: string): string {
+  return text.replace(hiding, (sign) => {
+    const code = sign.charCodeAt(0);
+    return code < 0x20 ? String.fromCharCode(0x2400 + code) : `[U+${code.toString(16).toUpperCase().padStart(4, '0')}]`;
+  });
+}
+
+/// All but tabs and ends of lines, which only make room.
+const hiding = /[\0-\x08\v\f\x0e-\x1f\x7f-\x9f\u061c\u200e\u200f\u2028-\u202e\u2066-\u2069\ufeff]/g;
+
 /// A number with as few digits as tell it apart on the screen.
 export function brief(value: number): string {
   if (!Number.isFinite(value)) return '–';

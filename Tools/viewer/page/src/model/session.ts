@@ -104,7 +104,7 @@ export class Session {
     this.duration = this.wholeDuration();
     this.appearances = cursorAppearances(this.track('cursorImage'));
     this.clicks = clicksOf(this.track('cursorAction'), this.duration);
-    this.markers = markersOf(this);
+    this.markers = markersOf(this).filter((time) => time >= 0 && time <= this.duration);
     this.idle = idleStretches(this);
     this.speed = speedOf(this.track('cursorLocation'));
   }
