@@ -60,8 +60,11 @@ protected:
         return recordingIn(output());
     }
 
+    /// As the page has it: nobody is told where the recording lay.
     Json reportOf(const std::string& command, const std::string& file) const {
-        return Json::parse(runTool({command, "--json", file}).output).at("files").at(0);
+        Json report = Json::parse(runTool({command, "--json", file}).output).at("files").at(0);
+        report["path"] = std::filesystem::path(file).filename().string();
+        return report;
     }
 };
 
@@ -70,8 +73,6 @@ TEST_F(ViewCommand, PutsWhatIsKnownOfARecordingIntoThePage) {
     EXPECT_EQ(recording.at("schema"), "zulm.view");
     EXPECT_EQ(recording.at("schema_version"), 1);
     EXPECT_EQ(recording.at("name"), std::filesystem::path(movie()).filename().string());
-    EXPECT_EQ(recording.at("info").at("path"), recording.at("name")); // nobody is told where the recording lay
-    EXPECT_EQ(recording.at("verify").at("path"), recording.at("name"));
     EXPECT_EQ(recording.at("info"), reportOf("info", movie()));
     EXPECT_EQ(recording.at("verify"), reportOf("verify", movie()));
 }

@@ -49,14 +49,38 @@ for (const [name, { path, show }] of Object.entries(views))
     }
   });
 
-for (const size of [
-  [360, 740],
-  [768, 1024],
-  [1280, 800],
-  [3840, 2160],
+/// Controls that are cut by the edge of the screen, or that lie below another thing; those of the table scroll with it.
+function hiddenControls() {
+  const width = document.documentElement.clientWidth;
+  const controls = [...document.querySelectorAll('button, select, input, [role="tab"]')];
+  return controls
+    .filter((element) => element.checkVisibility({ visibilityProperty: true }) && element.getBoundingClientRect().width > 0)
+    .flatMap((element) => {
+      element.scrollIntoView({ block: 'center', inline: 'nearest' });
+      const { left, right, top, bottom, width: wide, height } = element.getBoundingClientRect();
+      const points = [0.15, 0.5, 0.85].map((part) => document.elementFromPoint(left + wide * part, (top + bottom) / 2));
+      const isCovered = points.some((seen) => !seen || !(element.contains(seen) || seen.contains(element)));
+      const isSquare = !element.matches('.is-icon') || Math.abs(wide - height) < 2;
+      const isCut = left < 0 || right > width + 0.5 || element.scrollWidth > element.clientWidth + 1;
+      const name = element.id || element.getAttribute('aria-label') || element.textContent;
+      return isCovered || !isSquare || (isCut && !element.matches('input')) ? [`${name} at ${left} to ${right}, ${top}`] : [];
+    });
+}
+
+for (const [size, text] of [
+  [[360, 740], 100],
+  [[500, 900], 100],
+  [[768, 1024], 100],
+  [[1024, 768], 100],
+  [[1280, 800], 100],
+  [[3840, 2160], 100],
+  [[1440, 900], 200],
+  [[720, 450], 100], // 1440 by 900, everything twice as large
+  [[500, 900], 200],
 ])
-  test(`nothing is wider than the screen at ${size.join(' by ')}`, async () => {
+  test(`nothing is cut or covered at ${size.join(' by ')}, text at ${text} %`, async () => {
     const { page, close } = await open(recording.page, { size });
+    await page.evaluate((text) => (document.documentElement.style.fontSize = text === 100 ? '' : `${(16 * text) / 100}px`), text);
     await opened(page);
     await ready(page);
     const { width, stage } = await page.evaluate(() => ({
@@ -64,13 +88,71 @@ for (const size of [
       stage: document.getElementById('frame').getBoundingClientRect().width,
     }));
     assert.ok(width <= size[0], `${width} pixels`);
-    assert.ok(stage > size[0] * 0.3, `the movie is ${stage} pixels wide`);
-    for (const button of await page.locator('.transport > button:visible').all()) {
-      const box = await button.boundingBox();
-      assert.ok(box.x >= 0 && box.x + box.width <= size[0], `${await button.getAttribute('id')} is at ${box.x}`);
-    }
+    assert.ok(stage > size[0] * (text > 100 ? 0.25 : 0.3), `the movie is ${stage} pixels wide`);
+    assert.deepEqual(await page.evaluate(hiddenControls), []);
+    for (const id of ['frame-back', 'frame-forward', 'full-screen', 'clock-total'])
+      assert.ok(await page.locator(`#${id}`).isVisible(), id);
     await close();
   });
+
+test('the movie stays in sight where the page scrolls', async () => {
+  for (const size of [[360, 740], [720, 450]]) {
+    const { page, close } = await open(recording.page, { size });
+    await opened(page);
+    await ready(page);
+    await page.evaluate(() => scrollTo(0, document.documentElement.scrollHeight));
+    await page.waitForFunction(() => scrollY > 100);
+    const { y, height } = await page.locator('#frame').boundingBox();
+    assert.ok(y >= 0 && height > 100 && y + height < size[1] * 0.7, `${y} to ${y + height}`);
+    await close();
+  }
+});
+
+test('full screen has a scrubber', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  await ready(page);
+  assert.equal(await page.locator('#scrubber').isVisible(), false);
+  await page.locator('#full-screen').click();
+  await page.waitForFunction(() => document.fullscreenElement);
+  const box = await page.locator('#scrubber').boundingBox();
+  assert.ok(box.y > 0 && box.y + box.height <= page.viewportSize().height);
+  await page.mouse.click(box.x + box.width / 2, box.y + box.height / 2);
+  const { time } = await page.evaluate(() => zulmViewer.state());
+  assert.ok(Math.abs(time - 10) < 0.2, `${time}`);
+  await page.keyboard.press('Space');
+  await page.waitForFunction(() => zulmViewer.state().playing);
+  await close();
+});
+
+test('while a recording loads nobody is asked for one', async () => {
+  const before = () => {
+    globalThis.Worker = class {
+      postMessage() {} // takes forever
+      terminate() {}
+    };
+  };
+  const { page, close } = await open(recording.page, { before, size: [360, 740] });
+  assert.equal(await page.locator('#welcome-title').innerText(), 'Opening Recording.mp4…');
+  assert.ok(await page.locator('.welcome progress').isVisible());
+  assert.equal(await page.locator('#welcome-open').isVisible(), false);
+  await close();
+});
+
+test('heads of columns are whole', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  for (const kind of ['cursorImage', 'keyboardAction', 'systemData']) {
+    await page.getByLabel('Stream', { exact: true }).selectOption(kind);
+    const cut = await page.evaluate(() =>
+      [...document.querySelectorAll('.table-head > *')]
+        .filter(({ scrollWidth, clientWidth }) => scrollWidth > clientWidth)
+        .map(({ textContent }) => textContent),
+    );
+    assert.deepEqual(cut, [], kind);
+  }
+  await close();
+});
 
 test('whoever wants less motion gets no trail', async () => {
   const drawn = async (reducedMotion) => {

@@ -119,6 +119,7 @@ export class App implements Page {
   private async open(source: Blob | string, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
     const opening = ++this.opened;
     document.body.classList.add('is-busy');
+    setText(byId('welcome-title'), `Opening ${shown(name)}…`);
     try {
       if (source instanceof Blob && source.size === 0) throw new Error('it is empty');
       const { id, decoded, problems } = await this.decoder.open(source, name);
@@ -134,9 +135,14 @@ export class App implements Page {
       this.complain(`${name} cannot be shown: ${wordsOf(error, name)}.`);
       this.decoder.keep();
     } finally {
-      if (opening === this.opened) document.body.classList.remove('is-busy');
+      if (opening === this.opened) this.isOpened();
       ++this.finished;
     }
+  }
+
+  private isOpened(): void {
+    document.body.classList.remove('is-busy');
+    setText(byId('welcome-title'), 'Drop a recording here');
   }
 
   private setMovie(url: string | null, name: string): void {

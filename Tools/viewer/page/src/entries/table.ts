@@ -23,11 +23,12 @@ function leastWidth(rows: Rows, column: number): number {
   const { name, title, isNumber } = rows.columns[column]!;
   if (column === 0) return 4.75;
   if (name === 'kind') return 8;
-  if (!isNumber) return 7;
-  let longest = Math.min(title.length, 9); // which may be cut
+  const head = Math.max(3.5, title.length * letter);
+  if (!isNumber) return Math.max(7, head);
+  let longest = title.length;
   const step = Math.max(1, Math.floor(rows.count / sampled));
   for (let row = 0; row < rows.count; row += step) longest = Math.max(longest, rows.cell(row, column).length);
-  return Math.max(3.5, Math.min(longest, 22) * letter);
+  return Math.max(head, Math.min(longest, 22) * letter);
 }
 
 export class Table {

@@ -143,7 +143,7 @@ export class Stage {
     const text = captionText(parts);
     if (text === this.shownCaption) return;
     this.shownCaption = text;
-    this.caption.style.fontSize = `${Math.max(12, Math.min(34, this.width * 0.024))}px`;
+    this.caption.style.fontSize = `${Math.max(12 * uiScale(), Math.min(34, this.width * 0.024))}px`;
     this.caption.hidden = parts.length === 0;
     this.caption.dataset.text = text;
     this.caption.replaceChildren(...parts.map(captionPart));

@@ -58,6 +58,7 @@ function watchPointer(): void {
 function usesKey({ target, key }: KeyboardEvent): boolean {
   const element = target as Element;
   if (element.closest('dialog[open]')) return true;
+  if (element.matches('input[type="range"]')) return /^(Arrow|Home|End|Page)/.test(key);
   if (element.matches('input:not([type="checkbox"]), textarea, select')) return true;
   return key === ' ' && element !== clicked && element.matches('button, input, summary');
 }
