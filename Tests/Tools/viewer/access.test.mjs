@@ -4,6 +4,7 @@ import assert from 'node:assert/strict';
 import { readFileSync, writeFileSync } from 'node:fs';
 import { join } from 'node:path';
 import { test } from 'node:test';
+import { attached, positionsOf } from './numbered.mjs';
 import { axeSource, emptyPage, folder, open, opened, ready, recordedSession, seek } from './support.mjs';
 
 const recording = recordedSession();
@@ -170,4 +171,132 @@ test('whoever wants less motion gets no trail', async () => {
   };
   assert.equal(await drawn('no-preference'), true);
   assert.equal(await drawn('reduce'), false);
+});
+
+/// The largest contrast of anything drawn in a part of the lanes with the page below it.
+function contrastIn({ left, top, width, height }) {
+  const canvas = document.querySelector('.lanes-canvas');
+  const ratio = canvas.width / canvas.clientWidth;
+  const [x, y, w, h] = [left, top, width, height].map((value) => Math.round(value * ratio));
+  const { data } = canvas.getContext('2d').getImageData(x, y, w, h);
+  const light = (r, g, b) =>
+    [r, g, b]
+      .map((value) => (value / 255 <= 0.03928 ? value / 255 / 12.92 : ((value / 255 + 0.055) / 1.055) ** 2.4))
+      .reduce((sum, value, i) => sum + value * [0.2126, 0.7152, 0.0722][i], 0);
+  const page = light(...getComputedStyle(document.querySelector('.timeline')).backgroundColor.match(/[\d.]+/g).map(Number));
+  let most = 1;
+  for (let i = 0; i < data.length; i += 4) {
+    if (data[i + 3] < 250) continue;
+    const drawn = light(data[i], data[i + 1], data[i + 2]);
+    most = Math.max(most, (Math.max(drawn, page) + 0.05) / (Math.min(drawn, page) + 0.05));
+  }
+  return most;
+}
+
+test('bands, rests and other clicks can be told without fine colours', async () => {
+  const rested = attached('Rested', 'plain.mp4', { cursorLocation: positionsOf([[0, 200, 200], [10, 300, 300]]) });
+  for (const theme of ['light', 'dark']) {
+    const { page, close } = await open(recording.page, { theme });
+    await opened(page);
+    await page.waitForTimeout(300);
+    const placeOf = async (title) => {
+      const label = await page.locator('.lane-label', { hasText: title }).boundingBox();
+      const body = await page.locator('.lanes-body').boundingBox();
+      return { top: label.y - body.y, height: label.height - 1, width: body.width };
+    };
+    for (const title of ['Application', 'Hover']) {
+      const { top, height, width } = await placeOf(title);
+      const edge = { left: width * 0.3, top: top + 2, width: width * 0.3, height: 3 }; // above the names
+      const contrast = await page.evaluate(contrastIn, edge);
+      assert.ok(contrast >= 3, `${theme}: ${title} ${contrast.toFixed(2)}`);
+      assert.ok(height > 10);
+    }
+    // At half its height a disc is as wide as a square, near its top it is not.
+    const { top, width } = await placeOf('Clicks');
+    const rows = await page.evaluate(
+      ({ top, places }) => {
+        const canvas = document.querySelector('.lanes-canvas');
+        const ratio = canvas.width / canvas.clientWidth;
+        const context = canvas.getContext('2d');
+        const filled = (x, y) => {
+          const { data } = context.getImageData(Math.round((x - 8) * ratio), Math.round(y * ratio), Math.round(16 * ratio), 1);
+          return data.filter((value, i) => i % 4 === 3 && value > 200).length / ratio;
+        };
+        return places.map((x) => filled(x, top + 10 - 3));
+      },
+      { top, places: [1.5, 8].map((time) => (time / 20) * width) },
+    );
+    assert.ok(rows[0] <= 5 && rows[1] >= 6, `a left click is ${rows[0]} wide near its top, a right one ${rows[1]}`);
+    await close();
+
+    const rest = await open(rested.page, { theme });
+    await opened(rest.page);
+    await rest.page.waitForTimeout(300);
+    const body = await rest.page.locator('.lanes-body').boundingBox();
+    const contrast = await rest.page.evaluate(contrastIn, { left: body.width * 0.2, top: 0, width: 40, height: 3 });
+    assert.ok(contrast >= 3, `${theme}: a rest ${contrast.toFixed(2)}`);
+    await rest.close();
+  }
+});
+
+test('forced colours keep what is selected and what has the keys', async () => {
+  const { page, close } = await open(recording.page, { forcedColors: 'active' });
+  await opened(page);
+  await page.locator('.table-row:visible').nth(3).click();
+  const colours = (selector) =>
+    page.evaluate((selector) => {
+      const { backgroundColor, outlineStyle, outlineWidth, color } = getComputedStyle(document.querySelector(selector));
+      return { backgroundColor, outlineStyle, outlineWidth, color };
+    }, selector);
+  const plain = await colours('.table-row:not(.is-selected)');
+  const selected = await colours('.table-row.is-selected');
+  assert.notEqual(selected.backgroundColor, plain.backgroundColor);
+  await page.keyboard.press('Shift+Tab');
+  const focused = await colours(':focus');
+  assert.ok(focused.outlineStyle === 'solid' && parseFloat(focused.outlineWidth) >= 2, JSON.stringify(focused));
+  await close();
+});
+
+test('splitters tell their place, Escape closes the menu, keys move the lanes', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  const value = async (name) => Number(await page.locator('#side-splitter').getAttribute(`aria-value${name}`));
+  const width = async () => (await page.locator('.side').boundingBox()).width;
+  assert.ok(Math.abs((await value('now')) - (await width())) <= 1);
+  assert.equal(await value('max'), 768);
+  await page.locator('#side-splitter').focus();
+  await page.keyboard.press('ArrowLeft');
+  assert.ok(Math.abs((await value('now')) - (await width())) <= 1);
+  await page.locator('#layers-button').click();
+  await page.locator('#play').focus();
+  await page.keyboard.press('Escape');
+  assert.equal(await page.locator('#layers-menu').isVisible(), false);
+  for (let i = 0; i < 3; ++i) await page.keyboard.press('+');
+  await page.keyboard.press('>');
+  await page.keyboard.press('>');
+  const shown = () => page.locator('.overview-window').evaluate((element) => parseFloat(element.style.left));
+  await page.waitForFunction(() => parseFloat(document.querySelector('.overview-window').style.left) > 5);
+  const before = await shown();
+  await page.keyboard.press('<');
+  await page.waitForFunction((before) => parseFloat(document.querySelector('.overview-window').style.left) < before, before);
+  await close();
+});
+
+test('units and words are those of the reader', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  await page.keyboard.press('k');
+  await seek(page, 3.6);
+  const labels = (await page.locator('.lane-labels').innerText()).replaceAll('\n', ' ');
+  assert.match(labels, /CPU usage [\d.]+ %/);
+  assert.match(labels, /Scroll [↑↓] \d+ px/);
+  assert.equal(await page.locator('#caption kbd').innerText(), 'Return');
+  assert.deepEqual(await page.locator('.legend').allInnerTexts(), ['x', 'y']);
+  assert.equal(await page.locator('#heat-legend').isVisible(), false);
+  await page.keyboard.press('7');
+  assert.ok(await page.locator('#heat-legend').isVisible());
+  await page.getByRole('tab', { name: 'Facts' }).click();
+  assert.match(await page.locator('#pane-facts').innerText(), /Memory\s+[\d.]+ GB/);
+  assert.doesNotMatch(await page.locator('body').innerText(), /keystroke/i);
+  await close();
 });

@@ -212,6 +212,10 @@ export class App implements Page {
     else this.timeline.zoom(factor);
   }
 
+  pan(part: number): void {
+    this.timeline.pan(part);
+  }
+
   private followLink(): void {
     const time = timeInLink(location.hash);
     if (time !== undefined && this.session && Math.abs(time - this.player.time) > 0.0005) this.seek(time);

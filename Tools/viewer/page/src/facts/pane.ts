@@ -2,7 +2,7 @@
 
 import type { StreamSummary } from '#decoder';
 import { doubtsAbout } from '../model/checks';
-import { brief, bytes, clock, count, plural, shown, titleOf } from '../model/format';
+import { brief, bytes, clock, count, memoryText, plural, shown, titleOf } from '../model/format';
 import type { Size } from '../model/geometry';
 import { idleTime } from '../model/idle';
 import type { Finding, Session } from '../model/session';
@@ -83,7 +83,7 @@ function machineFacts(session: Session): Fact[] {
   if (!track || track.count === 0) return [];
   return Object.entries(machineNames).map(([column, name]) => [
     name,
-    track.text(column, 0).replace(/^[A-Za-z]+:/, '') || '–',
+    memoryText(track.text(column, 0).replace(/^[A-Za-z]+:/, '')) || '–',
   ]);
 }
 

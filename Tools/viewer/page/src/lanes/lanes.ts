@@ -8,7 +8,6 @@ import type { Rect } from '../model/geometry';
 import { countBefore, countUntil, lastAt } from '../model/search';
 import { rectAt, type HiddenStream, type Session } from '../model/session';
 import type { Track } from '../model/track';
-import type { Palette } from '../ui/palette';
 import { Extremes } from './extremes';
 import { drawArea, drawBands, drawDensity, drawLine, type Curve, type Lane, type LaneCanvas } from './lane';
 
@@ -64,9 +63,9 @@ function filled(session: Session, kind: string): Track | undefined {
 class NameColours {
   private readonly places = new Map<string, number>();
 
-  of(name: string, { bands }: Palette): string {
+  of(name: string): number {
     if (!this.places.has(name)) this.places.set(name, this.places.size);
-    return bands[this.places.get(name)! % bands.length]!;
+    return this.places.get(name)!;
   }
 }
 
@@ -74,16 +73,15 @@ interface BandName {
   text: string;
   index: number;
   time: number;
-  palette: Palette;
 }
 
-/// A band for each entry.
+/// A band for each entry, in one of the colours of bands.
 function bandLane(
   session: Session,
   kind: string,
   title: string,
   textOf: (track: Track, index: number) => string,
-  colourOf: (name: BandName) => string,
+  colourOf: (name: BandName) => number,
 ): Lane | undefined {
   const track = filled(session, kind);
   return (
@@ -93,8 +91,10 @@ function bandLane(
       draw: (canvas) =>
         drawBands(canvas, track.times, (index) => {
           const [time, text] = [track.times[index]!, textOf(track, index)];
-          const colour = colourOf({ text, index, time, palette: canvas.palette });
-          return { start: time, end: track.endOf(index, session.duration), text, colour };
+          const { bands, bandEdges } = canvas.palette;
+          const place = colourOf({ text, index, time }) % bands.length;
+          const end = track.endOf(index, session.duration);
+          return { start: time, end, text, colour: bands[place]!, edge: bandEdges[place]! };
         }),
       valueAt: (time) => {
         const index = track.at(time);
@@ -108,8 +108,8 @@ const textsOf = (column: string) => (track: Track, index: number) => track.text(
 
 function textLane(session: Session, kind: string, column: string, title: string): Lane | undefined {
   const colours = new NameColours();
-  return bandLane(session, kind, title, textsOf(column), ({ text, time, palette }) =>
-    colours.of(appAt(session, time) || text, palette),
+  return bandLane(session, kind, title, textsOf(column), ({ text, time }) =>
+    colours.of(appAt(session, time) || text),
   );
 }
 
@@ -126,7 +126,7 @@ function slideLane(session: Session): Lane | undefined {
     ['slideComment', 'comment'],
   ];
   const [kind, column] = kinds.find(([kind]) => filled(session, kind)) ?? ['', ''];
-  return bandLane(session, kind, 'Slides', textsOf(column), ({ index, palette }) => palette.bands[index % 2]!);
+  return bandLane(session, kind, 'Slides', textsOf(column), ({ index }) => index % 2);
 }
 
 function rectText(track: Track, index: number): string {
@@ -138,7 +138,7 @@ function rectText(track: Track, index: number): string {
 function windowLane(session: Session): Lane | undefined {
   if (filled(session, 'topmostAppName') || filled(session, 'topmostWindowTitle')) return undefined;
   const colours = new NameColours();
-  return bandLane(session, 'topmostWindow', 'Window', rectText, ({ text, palette }) => colours.of(text, palette));
+  return bandLane(session, 'topmostWindow', 'Window', rectText, ({ text }) => colours.of(text));
 }
 
 const roomForClicks = 6; // pixels to a click, from which on each is drawn
@@ -181,9 +181,16 @@ function drawClick(canvas: LaneCanvas, click: Click): void {
     context.globalAlpha = 1;
   }
   context.fillRect(x - 0.75, top + 4, 1.5, height - 8);
-  context.beginPath();
-  context.arc(x, middle, 3, 0, 2 * Math.PI);
-  context.fill();
+  context.fill(clickShape(click.button, x, middle));
+}
+
+/// A disc for the left button, a square for the right one, a triangle for all others.
+function clickShape(button: string, x: number, y: number): Path2D {
+  const shape = new Path2D();
+  if (button === 'left') shape.arc(x, y, 3.5, 0, 2 * Math.PI);
+  else if (button === 'right') shape.rect(x - 3.5, y - 3.5, 7, 7);
+  else for (const [dx, dy] of [[-4.5, 3.5], [4.5, 3.5], [0, -4.5]] as const) shape.lineTo(x + dx, y + dy);
+  return shape;
 }
 
 const roomForKeys = 12; // pixels to a key, from which on each shows what it is
@@ -204,7 +211,7 @@ function keyLane(session: Session, { showsKeys }: LaneOptions): Lane | undefined
     valueAt: (time) => {
       const track = keys();
       const index = track.at(time);
-      return index >= 0 && time - track.times[index]! < 1 ? track.text('label', index) : '';
+      return index >= 0 && time - track.times[index]! < 1 ? keyCap(track.text('label', index)) : '';
     },
   };
 }
@@ -262,7 +269,7 @@ function scrollLane(session: Session): Lane | undefined {
       const index = track.at(time);
       if (index < 0 || time - track.times[index]! > 0.5) return '';
       const [x, y] = [track.number('x', index), track.number('y', index)];
-      return [x && `${x > 0 ? '→' : '←'} ${Math.abs(x)}`, y && `${y > 0 ? '↑' : '↓'} ${Math.abs(y)}`]
+      return [x && `${x > 0 ? '→' : '←'} ${Math.abs(x)} px`, y && `${y > 0 ? '↑' : '↓'} ${Math.abs(y)} px`]
         .filter(Boolean)
         .join('  ');
     },
@@ -322,7 +329,11 @@ function trailLane(session: Session, { region }: LaneOptions): Lane | undefined 
   const xs = new Extremes(valuesOf(track, (i) => track.number('x', i)));
   const ys = new Extremes(valuesOf(track, (i) => -track.number('y', i)));
   return {
-    title: 'Cursor x, y',
+    title: 'Cursor',
+    legend: [
+      { text: 'x', colour: 'accent' },
+      { text: 'y', colour: 'second' },
+    ],
     height: 32,
     draw: (canvas) => {
       const { x, y, width, height } = region();
@@ -363,6 +374,7 @@ function hoverLane(session: Session): Lane | undefined {
           end: times[index + 1] ?? session.duration,
           text: texts[index]!,
           colour: index % 2 ? canvas.palette.line : canvas.palette.grid,
+          edge: canvas.palette.edge,
         }),
         true,
       ),
@@ -400,7 +412,9 @@ function cpuLane(session: Session): Lane | undefined {
     draw: (canvas) => drawArea(canvas, curve, canvas.palette.second, 0.22),
     valueAt: (time) => {
       const index = track.at(time);
-      return index >= 0 ? brief(Math.round(track.number('cpuUsage', index) * 100) / 100) : '';
+      if (index < 0) return '';
+      const percent = track.number('cpuUsage', index) * (high === 1 ? 100 : 1);
+      return `${brief(Math.round(percent * 10) / 10)} %`;
     },
   };
 }

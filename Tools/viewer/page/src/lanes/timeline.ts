@@ -104,11 +104,16 @@ export class Timeline {
     this.lanes = lanesOf(session, this.events);
     this.values = this.lanes.map(() => make('span', { class: 'lane-value' }));
     this.labels.replaceChildren(
-      ...this.lanes.map(({ title, height, isHidden }, i) => {
+      ...this.lanes.map(({ title, legend = [], height, isHidden }, i) => {
         const label = make(
           'div',
           { class: isHidden ? 'lane-label is-hidden' : 'lane-label' },
-          make('span', { class: 'lane-title', title }, title),
+          make(
+            'span',
+            { class: 'lane-title', title },
+            title,
+            ...legend.flatMap(({ text, colour }) => [' ', make('span', { class: `legend is-${colour}` }, text)]),
+          ),
           isHidden ? make('span', { class: 'tag' }, 'hidden') : this.values[i]!,
         );
         label.style.height = `${(height + laneGap) / 16}rem`;
@@ -149,6 +154,13 @@ export class Timeline {
 
   showAll(): void {
     this.setRange({ from: 0, to: this.duration });
+  }
+
+  /// By a part of what is in sight.
+  pan(part: number): void {
+    const { from, to } = this.range;
+    const way = part * (to - from);
+    this.setRange({ from: from + way, to: to + way });
   }
 
   /// Around the playhead where that is in sight.
@@ -237,10 +249,8 @@ export class Timeline {
 
   private drawBackground(canvas: LaneCanvas): void {
     const { context, width, height, range } = canvas;
-    context.fillStyle = palette().idle;
     for (const { start, end } of this.session?.idle ?? [])
-      if (end > range.from && start < range.to)
-        context.fillRect(canvas.x(start), 0, canvas.x(end) - canvas.x(start), height);
+      if (end > range.from && start < range.to) drawIdle(canvas, canvas.x(start), canvas.x(end), height);
     context.fillStyle = palette().grid;
     for (const time of ticks(range, tickStep(range, width, 84)))
       context.fillRect(Math.round(canvas.x(time)), 0, 1, height);
@@ -339,4 +349,16 @@ export class Timeline {
     const left = Math.min(event.clientX - root.left + 12, root.width - this.tip.offsetWidth - 8);
     this.tip.style.transform = `translate(${Math.max(4, left)}px, ${event.clientY - root.top - this.tip.offsetHeight - 10}px)`;
   }
+}
+
+const idleEdge = 3; // pixels
+
+/// Shaded, with edges that can be told from the page.
+function drawIdle({ context, width }: LaneCanvas, start: number, end: number, height: number): void {
+  const [left, right] = [Math.max(-1, start), Math.min(width + 1, end)];
+  context.fillStyle = palette().idle;
+  context.fillRect(left, 0, right - left, height);
+  context.fillStyle = palette().edge;
+  context.fillRect(left, 0, right - left, idleEdge);
+  for (const x of [start, end - 1]) context.fillRect(x, 0, 1, height);
 }

@@ -42,6 +42,13 @@ export function bytes(value: number): string {
   return unit === 0 ? plural(value, 'byte') : `${value.toFixed(1)} ${units[unit]}`;
 }
 
+/// Memory such as "24105MB" in gigabytes.
+export function memoryText(text: string): string {
+  const megabytes = /^(\d+)\s*MB$/i.exec(text)?.[1];
+  const gigabytes = Number(megabytes) / 1000;
+  return megabytes ? `${Number(gigabytes.toFixed(gigabytes < 10 ? 1 : 0))} GB` : text;
+}
+
 /// A kind's name as a title: "cursorLocation" is "Cursor location".
 export function titleOf(kind: string): string {
   if (/^[0-9a-f]{8}-/.test(kind)) return kind;

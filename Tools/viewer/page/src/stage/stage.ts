@@ -114,6 +114,7 @@ export class Stage {
 
   private drawLayers(context: CanvasRenderingContext2D, scene: Scene): void {
     const isOn = (id: LayerId) => layers.some((layer) => layer.id === id && layer.isOn);
+    byId('heat-legend').hidden = !isOn('heat');
     if (isOn('heat')) drawHeat(context, scene, this.heatPicture());
     if (isOn('window')) drawWindow(context, scene);
     if (isOn('hover')) drawHover(context, scene);

@@ -58,11 +58,10 @@ function setUpLayers(page: Page): HTMLInputElement[] {
   document.addEventListener('pointerdown', (event) => {
     if (!(event.target as Element).closest('.menu-holder')) show(false);
   });
-  menu.parentElement!.addEventListener('keydown', (event) => {
+  document.addEventListener('keydown', (event) => {
     if (event.key !== 'Escape' || menu.hidden) return;
+    if (menu.contains(document.activeElement)) button.focus();
     show(false);
-    button.focus();
-    event.stopPropagation();
   });
   return boxes;
 }

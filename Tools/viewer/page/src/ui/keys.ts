@@ -20,6 +20,8 @@ export function setUpKeys(page: Page): void {
     '=': () => page.zoom(0.5),
     '-': () => page.zoom(2),
     '0': () => page.zoom(0),
+    '<': () => page.pan(-0.25),
+    '>': () => page.pan(0.25),
     '/': () => page.findEntries(),
     n: () => page.stepMatch(1),
     N: () => page.stepMatch(-1),
