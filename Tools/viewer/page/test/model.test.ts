@@ -9,7 +9,7 @@ import { placementOf } from '../src/model/geometry';
 import { linkTo, timeInLink } from '../src/model/link';
 import { markerAfter, markerBefore } from '../src/model/markers';
 import { countBefore, countUntil, lastAt } from '../src/model/search';
-import { Session, type Decoded } from '../src/model/session';
+import { believableEnd, Session, type Decoded } from '../src/model/session';
 import { Track } from '../src/model/track';
 
 export function entries(kind: string, time: number[], columns: Record<string, Column> = {}): Entries {
@@ -127,7 +127,7 @@ test('a recording without any input is not idle: nothing is known', () => {
   assert.deepEqual(session(entries('cpuUsage', [0])).idle, []);
 });
 
-test('the last region with an area is the recorded one, and the length covers every entry', () => {
+test('the last region with an area is the recorded one, and the movie says how long it is', () => {
   const recording = session(
     entries('recordingRegion', [0, 1], {
       x: Int32Array.of(1, 9),
@@ -138,7 +138,18 @@ test('the last region with an area is the recorded one, and the length covers ev
     entries('cpuUsage', [0, 25.5]),
   );
   assert.deepEqual(recording.region, { x: 1, y: 2, width: 3, height: 4 });
-  assert.equal(recording.duration, 25.5);
+  assert.equal(recording.duration, 20);
+});
+
+test('without a movie the last entry ends the recording, unless its time cannot be believed', () => {
+  const end = (...times: number[]) => believableEnd([Float64Array.of(0, 1, 8), Float64Array.from(times)]);
+  assert.equal(end(), 8);
+  assert.equal(end(25.5), 25.5);
+  assert.equal(end(1e9), 8);
+  assert.equal(end(9, 1e9, 2e9), 9);
+  assert.equal(end(30000, 50000, 90000, 100000), 100000);
+  assert.equal(believableEnd([Float64Array.of(1e9)]), 1e9);
+  assert.equal(believableEnd([]), 0);
 });
 
 test('the place where the cursor stayed longest is the warmest', () => {
@@ -159,6 +170,7 @@ test('links tell a time', () => {
   assert.equal(timeInLink('#t=abc'), undefined);
   assert.equal(timeInLink(''), undefined);
   assert.equal(linkTo(12.5000001), '#t=12.5');
+  assert.equal(linkTo(1.533334), '#t=1.533334', 'the picture after the one of 1.533');
 });
 
 test('numbers and times in words', () => {

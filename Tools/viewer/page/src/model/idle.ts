@@ -42,6 +42,7 @@ export function idleStretches(session: Pick<Session, 'track' | 'duration'>): Str
     if (end - start >= shortest) stretches.push({ start, end });
   };
   for (const time of active) {
+    if (time > session.duration) break;
     take(last, time);
     last = Math.max(last, time);
   }

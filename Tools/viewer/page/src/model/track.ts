@@ -1,6 +1,7 @@
 // One stream's entries in the order of their times.
 
 import type { Column, Entries } from '#decoder';
+import { shown } from './format';
 import { lastAt } from './search';
 
 export class Track {
@@ -34,9 +35,10 @@ export class Track {
     return typeof value === 'bigint' ? Number(value) : typeof value === 'number' ? value : NaN;
   }
 
+  /// As it is shown.
   text(name: string, index: number): string {
     const value = this.entries.columns[name]?.[this.row(index)];
-    return value === null || value === undefined ? '' : String(value);
+    return value === null || value === undefined ? '' : shown(String(value));
   }
 
   bytes(name: string, index: number): Uint8Array | null {
