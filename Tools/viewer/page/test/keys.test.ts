@@ -13,7 +13,7 @@ function track(...keys: Key[]): Track {
     time: Float64Array.from(keys, ([time]) => time),
     columns: {
       label: keys.map(([, label]) => label),
-      isTyped: Int32Array.from(keys, ([, , isTyped]) => Number(isTyped)),
+      is_typed: Int32Array.from(keys, ([, , isTyped]) => Number(isTyped)),
       first: Int32Array.from(keys, ([, , , first]) => first),
       end: Float64Array.from(keys, ([, , , , end]) => end),
     },

@@ -16,7 +16,7 @@ export function captionAt(keys: Track | undefined, time: number): CaptionPart[] 
   const index = keys?.at(time) ?? -1;
   if (!keys || index < 0 || time >= keys.number('end', index)) return parts;
   for (let i = keys.number('first', index); i <= index; ++i) {
-    const [text, isTyped] = [keys.text('label', i), keys.number('isTyped', i) === 1];
+    const [text, isTyped] = [keys.text('label', i), keys.number('is_typed', i) === 1];
     const last = parts[parts.length - 1];
     if (isTyped && last?.isTyped) last.text += text;
     else parts.push({ text, isTyped });

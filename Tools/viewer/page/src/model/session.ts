@@ -1,10 +1,10 @@
 // A recording that has been read: its tracks, and what follows from them.
 
-import type { Entries, StreamSummary } from '#decoder';
-import { cursorAppearances, type Appearance } from './appearances';
-import { clicksOf, type Click } from './clicks';
+import type { Entries, StreamSummary, Table } from '#decoder';
+import { appearancesIn, type Appearance } from './appearances';
+import { clicksIn, type Click } from './clicks';
 import { hasArea, type Point, type Rect } from './geometry';
-import { idleStretches, type Stretch } from './idle';
+import { idleIn, type Stretch } from './idle';
 import { markersOf } from './markers';
 import { speedOf, type Speed } from './speed';
 import { Track } from './track';
@@ -44,7 +44,11 @@ export interface Decoded {
   streams: StreamSummary[];
   entries: Entries[];
   /// The keys as captions show them.
-  keys: { clear: Entries; masked: Entries } | undefined;
+  keys: { clear: Table; masked: Table } | undefined;
+  clicks: Table | undefined;
+  idle: Table | undefined;
+  /// What holds at the times of the stream cursorImage.
+  appearances: Table | undefined;
   hidden: { stream: StreamSummary; entries: Entries | undefined }[];
   info: FileInfo;
   verify: FileCheck;
@@ -102,10 +106,10 @@ export class Session {
     const { duration } = decoded;
     this.movieDuration = duration && Number.isFinite(duration) && duration > 0 ? duration : undefined;
     this.duration = this.wholeDuration();
-    this.appearances = cursorAppearances(this.track('cursorImage'));
-    this.clicks = clicksOf(this.track('cursorAction'), this.duration);
+    this.appearances = appearancesIn(decoded.appearances);
+    this.clicks = clicksIn(decoded.clicks);
     this.markers = markersOf(this).filter((time) => time >= 0 && time <= this.duration);
-    this.idle = idleStretches(this);
+    this.idle = idleIn(decoded.idle);
     this.speed = speedOf(this.track('cursorLocation'));
   }
 
