@@ -255,10 +255,8 @@ Natural operator*(const Natural& left, const Natural& right) {
 std::strong_ordering operator<=>(const Natural& left, const Natural& right) {
     if (left.digits_.size() != right.digits_.size())
         return left.digits_.size() <=> right.digits_.size();
-    for (std::size_t i = left.digits_.size(); i-- > 0;)
-        if (left.digits_[i] != right.digits_[i])
-            return left.digits_[i] <=> right.digits_[i];
-    return std::strong_ordering::equal;
+    const auto [first, second] = std::mismatch(left.digits_.rbegin(), left.digits_.rend(), right.digits_.rbegin());
+    return first == left.digits_.rend() ? std::strong_ordering::equal : *first <=> *second;
 }
 
 Natural::Division Natural::dividedBy(const Natural& divisor) const {
@@ -277,8 +275,8 @@ Natural::Division Natural::dividedBy(const Natural& divisor) const {
     over.resize(digits_.size() + 1);
     Natural quotient;
     quotient.digits_.resize(over.size() - under.size());
-    for (std::size_t place = quotient.digits_.size(); place-- > 0;)
-        quotient.digits_[place] = divideAt({over.data() + place, under.size() + 1}, under);
+    for (std::size_t place = quotient.digits_.size(); place > 0; --place)
+        quotient.digits_[place - 1] = divideAt({over.data() + place - 1, under.size() + 1}, under);
     Natural remainder;
     remainder.digits_ = std::move(over);
     remainder.trim();

@@ -25,7 +25,7 @@ constexpr std::size_t s_mostDigits = 1000;
 constexpr std::uint64_t s_mostOfSmall = std::numeric_limits<std::int64_t>::max();
 
 std::uint64_t magnitudeOf(std::int64_t number) {
-    return number < 0 ? -static_cast<std::uint64_t>(number) : static_cast<std::uint64_t>(number);
+    return number < 0 ? static_cast<std::uint64_t>(-(number + 1)) + 1 : static_cast<std::uint64_t>(number);
 }
 
 Natural naturalOf(UnsignedWide number) {
@@ -106,8 +106,7 @@ struct Rational::Arithmetic {
 
     static Rational made(Wide numerator, UnsignedWide denominator) {
         const bool isNegative = numerator < 0;
-        const UnsignedWide magnitude =
-            isNegative ? -static_cast<UnsignedWide>(numerator) : static_cast<UnsignedWide>(numerator);
+        const auto magnitude = static_cast<UnsignedWide>(isNegative ? -numerator : numerator);
         if (std::max(magnitude, denominator) <= s_mostOfSmall)
             return made(isNegative, static_cast<std::uint64_t>(magnitude), static_cast<std::uint64_t>(denominator));
         return made(isNegative, naturalOf(magnitude), naturalOf(denominator));
@@ -201,7 +200,8 @@ struct Rational::Arithmetic {
         constexpr std::uint64_t mostExact = std::uint64_t{1} << s_precision;
         if (std::max(numerator, denominator) <= mostExact)
             return static_cast<double>(numerator) / static_cast<double>(denominator);
-        const int shift = shiftFor(std::bit_width(numerator), std::bit_width(denominator));
+        const int shift = shiftFor(static_cast<std::size_t>(std::bit_width(numerator)),
+                                   static_cast<std::size_t>(std::bit_width(denominator)));
         const UnsignedWide over = UnsignedWide{numerator} << std::max(shift, 0);
         const UnsignedWide under = UnsignedWide{denominator} << std::max(-shift, 0);
         return rounded(static_cast<std::uint64_t>(over / under), over % under == 0, -shift);

@@ -74,7 +74,7 @@ Decimal decimalOf(std::string_view number) {
     for (const char c : mantissa)
         if (c >= '0' && c <= '9' && (c != '0' || !decimal.digits.empty()))
             decimal.digits += c;
-    const std::size_t length = decimal.digits.find_last_not_of('0') + 1;
+    const std::size_t length = decimal.digits.empty() ? 0 : decimal.digits.find_last_not_of('0') + 1;
     decimal.exponent += static_cast<std::int64_t>(decimal.digits.size() - length);
     decimal.digits.resize(length);
     return decimal;
