@@ -37,6 +37,8 @@ void addRepairCommand(CLI::App& app, Action& chosen);
 void addStampCommand(CLI::App& app, Action& chosen);
 void addCompactCommand(CLI::App& app, Action& chosen);
 void addDetachCommand(CLI::App& app, Action& chosen);
+void addCutCommand(CLI::App& app, Action& chosen);
+void addRetimeCommand(CLI::App& app, Action& chosen);
 void addRedactCommand(CLI::App& app, Action& chosen);
 void addExtractCommand(CLI::App& app, Action& chosen);
 void addSalvageCommand(CLI::App& app, Action& chosen);

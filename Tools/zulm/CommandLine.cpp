@@ -31,7 +31,9 @@ const std::vector<CommandGroup> s_commandGroups{
      {addInfoCommand, addAtomsCommand, addDumpCommand, addStateCommand, addInsightsCommand, addDiffCommand,
       addGrepCommand, addViewCommand}},
     {"Check and rescue", {addVerifyCommand, addRepairCommand, addSalvageCommand}},
-    {"Change", {addAttachCommand, addStampCommand, addRedactCommand, addCompactCommand, addDetachCommand}},
+    {"Change",
+     {addAttachCommand, addStampCommand, addRetimeCommand, addCutCommand, addRedactCommand, addCompactCommand,
+      addDetachCommand}},
     {"Convert", {addExtractCommand, addConvertCommand}},
     {"Try", {addDemoCommand}}};
 
