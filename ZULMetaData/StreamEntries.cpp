@@ -1,5 +1,6 @@
 #include "ZULMetaData/StreamEntries.h"
 
+#include <cstring>
 #include <new>
 #include <streambuf>
 #include <utility>
@@ -129,15 +130,31 @@ bool readEntryBytes(std::string_view bytes, double& time, CursorImage& image, in
     const std::uint64_t baseSize = schema.GetSizeOfSchemaFieldSteps(schema.GetBaseInfoSteps(), record);
     if (baseSize == 0 || bytes.size() < baseSize)
         return false;
-    BytesInput input(bytes);
-    CursorImageReader reader(version);
-    reader.ReadBaseInfo(input, schema, record);
-    if (record.entrySize != bytes.size() - sizeof record.entrySize ||
-        record.justMetadataSize != bytes.size() - baseSize)
+    const auto take = [&bytes](const FieldInfo& field) {
+        if (!field.data && field.size != 0)
+            throw std::bad_alloc();
+        if (field.size != 0)
+            std::memcpy(field.data, bytes.data(), field.size);
+        bytes.remove_prefix(field.size);
+    };
+    const std::size_t size = bytes.size();
+    for (const SchemaFieldStep& step : schema.GetBaseInfoSteps())
+        if (step.existsIn(version))
+            take(step.fieldGetter(record));
+    if (record.entrySize != size - sizeof record.entrySize || record.justMetadataSize != bytes.size())
         return false;
-    reader.ReadMetaDataFields(input, schema, record);
-    if (reader.hasRunOutOfMemory())
-        throw std::bad_alloc();
+    image.freeImageData(true);
+    for (const SchemaFieldStep& step : schema.GetDataSteps()) {
+        if (bytes.empty() || !step.existsIn(version) || !step.condition(record))
+            continue;
+        const bool isImage = step.fieldGetter == schema.GetImageFieldInfoFn(); // which allocates the image
+        if ((isImage ? schema.GetImageSize(record) : step.fieldGetter(record).size) > bytes.size()) {
+            if (isImage)
+                image.freeImageData(true);
+            break;
+        }
+        take(step.fieldGetter(record));
+    }
     return true;
 }
 

@@ -62,6 +62,7 @@
 #include "Source/RecordingRedaction.h"
 #include "Source/ReportedNames.h"
 #include "Source/SafeMovieSave.h"
+#include "Source/StoredFields.h"
 #include "Source/StreamRedaction.h"
 #include "Source/StreamRetiming.h"
 #include "Source/StreamSalvage.h"

@@ -1,6 +1,7 @@
 #include "ZULMetaDataSession/Recording.h"
 
 #include "ZULMetaData/ZULMMetaDataWriter.h"
+#include "ZULMetaDataSession/RecordingStates.h"
 
 #include <algorithm>
 #include <array>
@@ -133,10 +134,23 @@ Track<Kind> trackOf(const ByteSource& stream) {
 struct Recording::State {
     State(const ByteSource& bytes, const std::string& name) : file(opened(bytes, name)), streams(file.streams()) {}
 
-    /// Whether the track of a kind was read.
-    struct Reading {
-        std::mutex mutex;
-        std::atomic<bool> isDone = false;
+    /// Whether something was read, such as the track of a kind. It is read once.
+    class Reading {
+    public:
+        template <class Work>
+        void once(Work work) {
+            if (isDone_.load(std::memory_order_acquire))
+                return;
+            const std::lock_guard lock(mutex_);
+            if (isDone_.load(std::memory_order_relaxed))
+                return;
+            work();
+            isDone_.store(true, std::memory_order_release);
+        }
+
+    private:
+        std::mutex mutex_;
+        std::atomic<bool> isDone_ = false;
     };
 
     RecordingFile file;
@@ -144,6 +158,8 @@ struct Recording::State {
     std::mutex validation; ///< of the file, which walks at the first question
     std::array<Reading, RecordedKinds::size> readings;
     detail::Tracks tracks;
+    Reading statesReading;
+    std::shared_ptr<const detail::RecordingStates> states;
 };
 
 Recording::Recording(const FileLocation& file) {
@@ -218,18 +234,35 @@ ByteSource Recording::decodableBytesOf(const uuid& kind) const {
 
 const detail::Tracks& Recording::tracksWith(std::size_t place) const {
     State& state = *state_;
-    State::Reading& reading = state.readings[place];
-    if (reading.isDone.load(std::memory_order_acquire))
-        return state.tracks;
-    const std::lock_guard lock(reading.mutex);
-    if (!reading.isDone.load(std::memory_order_relaxed)) {
+    state.readings[place].once([&] {
         RecordedKinds::forEach([&]<class Kind>() {
             if (detail::TracksOf<RecordedKinds>::placeOf<Kind>() == place)
                 std::get<Track<Kind>>(state.tracks) = trackOf<Kind>(decodableBytesOf(Kind::type));
         });
-        reading.isDone.store(true, std::memory_order_release);
-    }
+    });
     return state.tracks;
+}
+
+const std::shared_ptr<const detail::RecordingStates>& Recording::states() const {
+    state_->statesReading.once([this] {
+        state_->states =
+            std::make_shared<const detail::RecordingStates>([this]<class Kind>() { return track<Kind>(); });
+    });
+    return state_->states;
+}
+
+Snapshot Recording::at(double time, Interpolation interpolation) const {
+    const detail::RecordingStates& states = *this->states();
+    const detail::EntryCounts counts = states.countsUntil(time);
+    Snapshot snapshot;
+    snapshot.time = time;
+    states.show(counts, snapshot);
+    states.showCursor(counts, interpolation, snapshot);
+    return snapshot;
+}
+
+RecordedArea Recording::area() const {
+    return detail::areaOf(track<RecordingRegionKind>(), track<ScaleFactorKind>());
 }
 
 } // namespace ZULMetaData

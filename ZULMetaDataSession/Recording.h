@@ -14,6 +14,7 @@
 #include "../ZULMetaData/StreamEntries.h"
 #include "../ZULMetaDataBridge/Source/RecordingFile.h"
 #include "Error.h"
+#include "Snapshot.h"
 #include "Track.h"
 
 #include <cstddef>
@@ -30,23 +31,10 @@ namespace ZULMetaData {
 
 namespace detail {
 
-template <class List>
-struct TracksOf;
-template <class... Kinds>
-struct TracksOf<KindList<Kinds...>> {
-    using Type = std::tuple<Track<Kinds>...>;
-
-    /// Returns the place of a kind in the list.
-    template <class Kind>
-    static constexpr std::size_t placeOf() {
-        std::size_t place = 0;
-        ((std::is_same_v<Kind, Kinds> ? true : (++place, false)) || ...);
-        return place;
-    }
-};
-
 /// A track of every kind that is recorded.
 using Tracks = TracksOf<RecordedKinds>::Type;
+
+class RecordingStates;
 
 } // namespace detail
 
@@ -87,12 +75,25 @@ public:
     template <RecordedKind Kind>
     void read(const Callback<bool(double time, const TrackValueOf<Kind>& value)>& visit) const;
 
+    /// Returns everything that holds at a time. The recording must outlive its texts. Reads all tracks that a snapshot
+    /// shows at the first call. Throws `Error` if the header of one of them disagrees with its kind; a `Timeline` can
+    /// leave such a stream out.
+    Snapshot at(double time, Interpolation interpolation = Interpolation::Linear) const;
+
+    /// Returns what of the screen was recorded.
+    RecordedArea area() const;
+
     /// Returns the bytes of a stream as they are stored, header included. Any number of threads may read them, and they
     /// stay valid without the recording. Reading throws `Error`.
     ByteSource bytesOf(const StreamInfo& stream) const;
 
 private:
+    friend class Timeline;
+
     struct State;
+
+    /// Returns what all snapshots share, and prepares it at the first call.
+    const std::shared_ptr<const detail::RecordingStates>& states() const;
 
     /// Returns all tracks. Reads the one at this place at the first call.
     const detail::Tracks& tracksWith(std::size_t place) const;

@@ -17,6 +17,7 @@
 #include <numeric>
 #include <optional>
 #include <span>
+#include <tuple>
 #include <type_traits>
 #include <utility>
 #include <vector>
@@ -98,6 +99,22 @@ private:
 // ---------------------------------------------------------------------------------------------------------------
 
 namespace detail {
+
+/// The tracks of a list of kinds.
+template <class List>
+struct TracksOf;
+template <class... Kinds>
+struct TracksOf<KindList<Kinds...>> {
+    using Type = std::tuple<Track<Kinds>...>;
+
+    /// Returns the place of a kind in the list.
+    template <class Kind>
+    static constexpr std::size_t placeOf() {
+        std::size_t place = 0;
+        static_cast<void>(((std::is_same_v<Kind, Kinds> ? true : (++place, false)) || ...));
+        return place;
+    }
+};
 
 /// Returns whether the times ascend and none of them is not a number.
 inline bool ascend(std::span<const double> times) {

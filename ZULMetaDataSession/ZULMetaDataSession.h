@@ -2,6 +2,7 @@
 
 // Includes everything with which recorders and editors are written.
 
+#include "AbandonedSession.h"
 #include "EditList.h"
 #include "Error.h"
 #include "Insights/Camera.h"
@@ -12,7 +13,13 @@
 #include "Insights/Insights.h"
 #include "Insights/KeyCaptions.h"
 #include "Insights/Zooms.h"
+#include "Picture.h"
 #include "Rational.h"
 #include "Recording.h"
+#include "RecordingClock.h"
+#include "Retiming.h"
+#include "SessionWriter.h"
+#include "Snapshot.h"
+#include "Timeline.h"
 #include "Track.h"
 #include "TrackValues.h"

@@ -3,6 +3,7 @@
 #include "Reports/Number.h"
 #include "Reports/Text.h"
 
+#include <array>
 #include <cmath>
 
 namespace ZULMetaData::Bindings {
@@ -20,6 +21,32 @@ void EntryColumn::add(const CursorImage& cursor) {
         addDistinct({reinterpret_cast<const char*>(cursor.imageData), cursor.imageDataSize});
     else
         add(std::uint32_t{ZulmNothing});
+}
+
+void EntryColumn::add(const Text& text) {
+    if (text)
+        add(*text);
+    else
+        add(std::uint32_t{ZulmNothing});
+}
+
+void EntryColumn::add(const Blob& bytes) {
+    if (bytes)
+        addDistinct({reinterpret_cast<const char*>(bytes->data()), bytes->size()});
+    else
+        add(std::uint32_t{ZulmNothing});
+}
+
+EntryColumn EntryColumn::of(const TableColumn& column) {
+    constexpr std::array types{ZulmReal, ZulmInt32, ZulmUInt64, ZulmTexts, ZulmBytes}; // as in `TableColumn`
+    EntryColumn entries(column.name, types.at(column.values.index()));
+    std::visit(
+        [&entries](const auto& values) {
+            for (const auto& value : values)
+                entries.add(value);
+        },
+        column.values);
+    return entries;
 }
 
 void EntryColumn::addDistinct(std::string_view value) {

@@ -2,6 +2,7 @@
 
 #include "Bindings/JavaScript/BlockCache.h"
 #include "Bindings/JavaScript/EntryColumns.h"
+#include "Bindings/Tables/SessionTables.h"
 #include "Reports/DumpDocument.h"
 #include "Reports/Findings.h"
 #include "Reports/InfoReport.h"
@@ -19,6 +20,7 @@
 #include <concepts>
 #include <exception>
 #include <limits>
+#include <locale>
 #include <memory>
 #include <new>
 #include <optional>
@@ -37,18 +39,27 @@ using namespace ZULMetaData::Bindings;
 struct ZulmRecording {
     struct Stream {
         StreamReport report;
-        std::string kind; // or its identifier where it has none
+        std::string kind; // or its identifier if it has none
         std::string uuid;
         ZulmStream summary; // points into these texts
     };
 
     ZulmRecording(const ByteSource& bytes, const std::string& name)
-        : recording(bytes, name), duration(recording.duration()), found(summarized(recording.examinedStreams())),
-          hidden(summarized(recording.hiddenStreams())) {}
+        : bytes(bytes), recording(bytes, name), duration(recording.duration()),
+          found(summarized(recording.examinedStreams())), hidden(summarized(recording.hiddenStreams())) {}
+
+    /// Returns what tables are made from. It is opened at the first call.
+    const Recording& session() {
+        if (!opened)
+            opened.emplace(bytes, recording.name());
+        return *opened;
+    }
 
     static std::vector<Stream> summarized(const std::vector<StreamReport>& reports);
 
+    ByteSource bytes;
     RecordingFile recording;
+    std::optional<Recording> opened;
     std::optional<double> duration;
     std::vector<Stream> found;
     std::vector<Stream> hidden;
@@ -71,7 +82,7 @@ std::string& lastError() {
     return message;
 }
 
-/// Keeps exceptions in. Null where `work` threw.
+/// Lets no exception out. Returns null if `work` throws.
 template <class Work>
 auto orNull(Work work) noexcept -> decltype(work()) {
     try {
@@ -120,14 +131,14 @@ constexpr ZulmColumnType columnType() {
 template <class Kind>
 void collect(const RecordingFile& recording, const StreamReport& stream, ZulmEntries& entries) {
     using Value = typename Kind::Value;
-    ZULMetaData::detail::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
+    ZULMetaData::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
         entries.columns.emplace_back(key, columnType<Stored>());
     });
     recording.readEntries<Value>(stream, [&entries](double time, const Value& value) {
         entries.times.push_back(time);
         auto column = entries.columns.begin();
-        ZULMetaData::detail::visitStoredFields<Kind>(
-            value, [&column](const char*, const auto& stored) { (column++)->add(stored); });
+        ZULMetaData::visitStoredFields<Kind>(value,
+                                             [&column](const char*, const auto& stored) { (column++)->add(stored); });
         return true;
     });
 }
@@ -197,6 +208,32 @@ std::vector<StreamReport> streamsNamed(const ZulmRecording& opened, const char* 
             streams.push_back(stream);
     }
     return streams;
+}
+
+/// Turns the columns of a table into those that the caller sees.
+ZulmEntries* entriesOf(Table table) {
+    auto entries = std::make_unique<ZulmEntries>();
+    entries->times = std::move(table.times);
+    for (const TableColumn& column : table.columns)
+        entries->columns.push_back(EntryColumn::of(column));
+    for (const EntryColumn& column : entries->columns)
+        entries->views.push_back(column.view());
+    return entries.release();
+}
+
+/// Reads a list such as "least=3,flicker=1".
+InsightParameters parametersIn(const char* text) {
+    InsightParameters parameters;
+    std::istringstream list(text ? text : "");
+    list.imbue(std::locale::classic());
+    for (std::string name; std::getline(list, name, '=');) {
+        double value = 0;
+        if (!(list >> value) || (list.peek() != ',' && !list.eof()))
+            throw std::invalid_argument("the parameters are not a list such as least=3,flicker=1");
+        parameters[name] = value;
+        list.ignore();
+    }
+    return parameters;
 }
 
 } // namespace
@@ -271,6 +308,23 @@ ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys)
         return entriesOf(*recording, stream, [&](ZulmEntries& entries) {
             collectKeyCaptions(recording->recording, stream, showsKeys != 0, entries);
         });
+    });
+}
+
+ZulmEntries* zulm_states(ZulmRecording* recording, const double* times, size_t count, int32_t interpolates) {
+    return orNull([&] {
+        const Interpolation interpolation = interpolates != 0 ? Interpolation::Linear : Interpolation::Held;
+        return entriesOf(statesTable(recording->session(), {times, count}, interpolation));
+    });
+}
+
+ZulmEntries* zulm_insight(ZulmRecording* recording, const char* name, const char* parameters) {
+    return orNull([&] { return entriesOf(insightTable(recording->session(), name, parametersIn(parameters))); });
+}
+
+ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits) {
+    return orNull([&] {
+        return entriesOf(retimedTable(recording->session(), EditList::read(edits, recording->recording.name())));
     });
 }
 

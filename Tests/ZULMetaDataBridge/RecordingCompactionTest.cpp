@@ -58,6 +58,17 @@ TEST_F(RecordingCompactionTest, LeavesTheMediaAloneWithoutAnyMetaData) {
     EXPECT_EQ(compacted("a.avi", riffMedia() + zulmChunk({locationStream()}), KeptMetaData::Nothing), riffMedia());
 }
 
+TEST_F(RecordingCompactionTest, KeepsWhoMadeTheRecordingWithoutTheStreams) {
+    const std::string creator = atom("ZULR", std::string(64, 'c'));
+    EXPECT_EQ(compacted("a.mp4", media() + creator + zulmAtom({locationStream()}), KeptMetaData::Creators),
+              media() + creator);
+    EXPECT_EQ(compacted("b.mp4", media() + zulmAtom({locationStream()}) + creator, KeptMetaData::Creators),
+              media() + creator);
+    const std::string streams = zulmAtom({locationStream()});
+    const std::string blank = be32(1) + "free" + be64(streams.size()) + std::string(streams.size() - 16, '\0');
+    EXPECT_EQ(compacted("c.mp4", creator + streams + media(), KeptMetaData::Creators), creator + blank + media());
+}
+
 TEST_F(RecordingCompactionTest, LeavesOutAnEntryThatIsIncomplete) {
     EXPECT_EQ(compacted("a.avi", riffMedia() + zulmChunk({locationStream() + "12"})),
               riffMedia() + zulmChunk({locationStream()}));

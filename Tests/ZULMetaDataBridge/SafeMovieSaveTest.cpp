@@ -287,6 +287,18 @@ TEST_F(SafeSave, RefusesDoubtfulSourcesUnlessTheyAreAskedFor) {
     }
 }
 
+TEST_F(SafeSave, AttachesEveryByteOfAStreamAsItIsStored) {
+    const std::string torn = locationStream() + "torn";
+    const std::string odd = streamHeader("2b7b6aff", 1, 0) + "odd";
+    writeFile(movie, media());
+    const AttachResult result = SafeMovieSave(movie).attach(
+        {StreamSource::memory(torn, "torn").asStored(), StreamSource::memory(odd, "odd").asStored()});
+    EXPECT_EQ(contentsOf(movie), media() + zulmAtom({torn, odd}));
+    EXPECT_EQ(result.streams[0].bytes, torn.size());
+    EXPECT_EQ(result.streams[0].bytesCut, 0U);
+    EXPECT_EQ(result.streams[0].entries, 2U);
+}
+
 TEST_F(SafeSave, CutsHostileStreamsDownToWhatIsWhole) {
     const std::map<std::string, std::string> hostile{
         {"an entry of size 0", streamHeader(s_appNames, 1, 0) + textEntry(0.5, "Abc") + le32(0) + "rest"},
@@ -637,6 +649,43 @@ TEST_F(SafeSave, StampsAgainBehindTheFirst) {
     const auto infos = readRecordingInfo(*MetaDataParser::create(movie));
     ASSERT_EQ(infos.size(), 2U);
     EXPECT_EQ(infos[1].creator.version(), "2");
+}
+
+TEST_F(SafeSave, AttachesAndStampsAsOneAfterTheOther) {
+    const auto files = sources({stream("a.dat", locationStream() + "torn")});
+    const std::string twice = folder / "Twice.mp4";
+    writeFile(movie, openEndedMedia());
+    writeFile(twice, openEndedMedia());
+    SafeMovieSave(twice).attach(files);
+    SafeMovieSave(twice).stamp("Recorder", "4.2");
+    const AttachResult result = SafeMovieSave(movie).attachAndStamp(AttachPlan(files), "Recorder", "4.2");
+    EXPECT_EQ(contentsOf(movie), contentsOf(twice));
+    EXPECT_EQ(result.repair.changes.size(), 1U);
+    ASSERT_EQ(result.streams.size(), 1U);
+    EXPECT_EQ(result.streams[0].bytesCut, 4U);
+    EXPECT_THROW(SafeMovieSave(movie).attachAndStamp(AttachPlan({}), "Recorder", "4.2"), SaveError);
+}
+
+TEST_F(SafeSave, DoesNeitherWhereAttachingOrStampingFails) {
+    const AttachPlan plan(sources({stream("a.dat", locationStream())}));
+    const std::size_t whole = media().size() + zulmAtom({locationStream()}).size() + 80;
+    for (std::size_t limit = media().size(); limit < whole; ++limit) {
+        writeFile(movie, openEndedMedia());
+        {
+            const FileSizeLimit fullDisk(limit);
+            EXPECT_THROW(SafeMovieSave(movie).attachAndStamp(plan, "Recorder", "4.2"), SaveError) << limit;
+        }
+        EXPECT_EQ(contentsOf(movie), openEndedMedia()) << limit;
+    }
+}
+
+TEST_F(SafeSave, MovesTheIndexOfFragmentsBehindTheStampToo) {
+    writeFile(movie, media() + atom("mfra", "index"));
+    const AttachPlan plan(sources({stream("a.dat", locationStream())}));
+    const AttachResult result =
+        SafeMovieSave(movie).attachAndStamp(plan, "Recorder", "4.2", SafeMovieSave::FragmentIndex::MoveToEnd);
+    EXPECT_EQ(result.fragmentIndex, FragmentIndexState::AtEnd);
+    EXPECT_EQ(bytesAt(std::filesystem::file_size(movie) - 13, 13), atom("mfra", "index"));
 }
 
 TEST_F(SafeSave, PlansWithoutChangingAnything) {

@@ -1,4 +1,12 @@
 zulm_add_tests(ZULMetaDataSessionTests
+  EditListTest
+  EditLists/AutoEditorTest
+  EditLists/CMX3600Test
+  EditLists/ConcatTest
+  EditLists/EditListFilesTest
+  EditLists/LosslessCutTest
+  EditLists/MovieEditListTest
+  EditLists/OpenTimelineTest
   Insights/CameraTest
   Insights/ChaptersTest
   Insights/ClicksTest
@@ -7,6 +15,15 @@ zulm_add_tests(ZULMetaDataSessionTests
   Insights/InsightsTest
   Insights/KeyCaptionsTest
   Insights/ZoomsTest
+  PictureTest
+  PieceClockTest
+  RationalTest
+  RecordingClockTest
   RecordingTest
+  RetimingTest
+  SessionWriterTest
+  SnapshotTest
+  TimeIndexTest
+  TimelineTest
   TrackTest)
 target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)

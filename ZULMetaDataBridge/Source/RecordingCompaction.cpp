@@ -89,7 +89,7 @@ void RecordingCompaction::chooseCreators() {
         if (!item.holdsRecordingInfo())
             continue;
         const bool isNew = item.size > s_mostCompared || seen.insert(detail::readAll(bytesOf(item))).second;
-        if (kept_ == KeptMetaData::Newest && isNew)
+        if (kept_ != KeptMetaData::Nothing && isNew)
             appended_.insert(appended_.begin(), item);
         else
             ++creatorsLeftOut_;
@@ -115,7 +115,7 @@ void RecordingCompaction::complete(const FileLocation& copy) {
 void RecordingCompaction::blankEarlierMetaData(std::ostream& out) const {
     const std::string zeros(s_mostCompared, '\0');
     for (const ContainerItem& item : std::span(items_).first(tail_)) {
-        if (!isOwn(item) || (item.holdsRecordingInfo() && kept_ == KeptMetaData::Newest))
+        if (!isOwn(item) || (item.holdsRecordingInfo() && kept_ != KeptMetaData::Nothing))
             continue;
         out.seekp(static_cast<std::streamoff>(item.offset + (isMovie() ? sizeof item.sizeField : 0)));
         out << (isMovie() ? detail::s_freeAtom : detail::s_junkChunk).text();

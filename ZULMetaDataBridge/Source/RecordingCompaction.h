@@ -22,7 +22,11 @@
 namespace ZULMetaData {
 
 /// Which metadata a copy has.
-enum class KeptMetaData { Newest, Nothing };
+enum class KeptMetaData {
+    Newest,   ///< the streams that readers find, and who made the recording
+    Creators, ///< who made the recording
+    Nothing,
+};
 
 /// Why a recording cannot be written anew. `what()` is a sentence about the file that does not name it.
 class ZULMETADATA_API CompactionError : public std::runtime_error {

@@ -73,6 +73,9 @@ AttachPlan::Stream measured(const StreamSource& source) {
     if (source.isChecked())
         if (const std::string doubt = doubtAbout(*extent, bytes.size()); !doubt.empty())
             throw SaveError(source.name(), doubt, SaveError::Reason::Doubtful);
+    if (source.isAsStored())
+        return {{source.name(), extent->header.uuid, 0, bytes.size(), extent->entries, 0, StreamExtent::AtEntry},
+                bytes};
     return {{source.name(), extent->header.uuid, 0, extent->wholeBytes, extent->entries,
              bytes.size() - extent->wholeBytes, extent->end},
             bytes};
@@ -325,6 +328,16 @@ StampResult SafeMovieSave::stamp(const std::string& creatorName, const std::stri
                                  FragmentIndex index) const {
     return save(movie_, progress_, [info = recordingInfo(creatorName, creatorVersion), index](Save& work) {
         return work.stamp(info, index);
+    });
+}
+
+AttachResult SafeMovieSave::attachAndStamp(const AttachPlan& plan, const std::string& creatorName,
+                                           const std::string& creatorVersion, FragmentIndex index) const {
+    plan.requireStreams(utf8Path(movie_));
+    return save(movie_, progress_, [&plan, info = recordingInfo(creatorName, creatorVersion), index](Save& work) {
+        AttachResult result = work.attach(plan, FragmentIndex::Leave);
+        result.fragmentIndex = work.stamp(info, index).fragmentIndex;
+        return result;
     });
 }
 

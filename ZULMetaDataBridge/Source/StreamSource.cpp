@@ -30,4 +30,10 @@ StreamSource StreamSource::unchecked() const {
     return source;
 }
 
+StreamSource StreamSource::asStored() const {
+    StreamSource source = unchecked();
+    source.isAsStored_ = true;
+    return source;
+}
+
 } // namespace ZULMetaData

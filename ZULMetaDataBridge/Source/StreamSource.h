@@ -35,8 +35,13 @@ public:
     /// whose first 24 bytes would pass for a header. Its entries are those that the header tells apart, perhaps none.
     StreamSource unchecked() const;
 
+    /// Returns the same source without the check, and as one of which every byte is attached: also those after its last
+    /// whole entry.
+    StreamSource asStored() const;
+
     const std::string& name() const { return name_; } ///< returns the path of its file, or what the caller said
-    bool isChecked() const { return isChecked_; }     ///< returns false after `unchecked`
+    bool isChecked() const { return isChecked_; }     ///< returns false after `unchecked` and `asStored`
+    bool isAsStored() const { return isAsStored_; }   ///< returns true after `asStored`
 
     /// Returns the bytes of the stream, header included. Throws `std::system_error` if its file cannot be opened.
     ByteSource open() const { return open_(); }
@@ -47,6 +52,7 @@ private:
     std::string name_;
     Callback<ByteSource()> open_;
     bool isChecked_ = true;
+    bool isAsStored_ = false;
 };
 
 } // namespace ZULMetaData
