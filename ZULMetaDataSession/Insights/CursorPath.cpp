@@ -1,5 +1,7 @@
 #include "ZULMetaDataSession/Insights/CursorPath.h"
 
+#include "ZULMetaDataSession/Snapshot.h"
+
 #include <algorithm>
 #include <cmath>
 #include <cstddef>
@@ -36,20 +38,6 @@ ScreenPoint pointBetween(const ScreenPoint& from, const ScreenPoint& to, double 
 /// Returns the point on the other side of `centre`.
 ScreenPoint mirroredPoint(const ScreenPoint& point, const ScreenPoint& centre) {
     return {2 * centre.x - point.x, 2 * centre.y - point.y};
-}
-
-/// Returns the median of the times between two entries at different times.
-double usualDistanceOf(std::span<const double> times) {
-    std::vector<double> distances;
-    distances.reserve(times.size());
-    for (std::size_t i = 1; i < times.size(); ++i)
-        if (times[i] > times[i - 1])
-            distances.push_back(times[i] - times[i - 1]);
-    if (distances.empty())
-        return s_longestUsualDistance;
-    const auto middle = distances.begin() + static_cast<std::ptrdiff_t>(distances.size() / 2);
-    std::nth_element(distances.begin(), middle, distances.end());
-    return std::min(*middle, s_longestUsualDistance);
 }
 
 /// Returns the positions through which the path passes, ordered by their times, one for each time.
@@ -299,7 +287,7 @@ private:
 CursorPath::CursorPath(const Track<CursorLocationKind>& positions, const std::vector<Click>& clicks,
                        const CursorPathOptions& options) {
     const std::span<const double> times = positions.times();
-    PathMaker maker(options, usualDistanceOf(times), times_, points_);
+    PathMaker maker(options, std::min(usualDistance(times), s_longestUsualDistance), times_, points_);
     const std::vector<Corner> pins = pinsOf(clicks);
     auto pin = pins.begin();
     for (std::size_t i = 0; i < times.size(); ++i) {

@@ -1,6 +1,7 @@
 #include "ZULMetaDataSession/Insights/Insights.h"
 
 #include "ZULMetaDataSession/Insights/ScreenGeometry.h"
+#include "ZULMetaDataSession/RecordingStates.h"
 
 #include <algorithm>
 #include <optional>
@@ -10,15 +11,6 @@ namespace ZULMetaData {
 namespace {
 
 constexpr double s_longestDuration = 366.0 * 86400; ///< in seconds; a later time is damaged
-
-/// Returns the last region that has an area.
-ScreenRect lastScreenOf(const Track<RecordingRegionKind>& regions) {
-    ScreenRect screen;
-    for (const Rect& region : regions.values())
-        if (const ScreenRect rect = detail::screenRect(region); detail::hasArea(rect))
-            screen = rect;
-    return screen;
-}
 
 template <class... Kinds>
 double lastTimeOf(const Track<Kinds>&... tracks) {
@@ -55,7 +47,8 @@ InsightSources insightSourcesOf(const Recording& recording, const Callback<void(
     read(sources.applications);
     read(sources.slides);
     read(regions);
-    sources.screen = lastScreenOf(regions);
+    if (const std::optional<Rect> region = detail::areaOf(regions, {}).region)
+        sources.screen = detail::screenRect(*region);
     sources.duration = durationOf(recording, sources);
     return sources;
 }
