@@ -5,7 +5,9 @@
 #include <algorithm>
 #include <cstdio>
 #include <fcntl.h>
+#include <filesystem>
 #include <span>
+#include <sys/stat.h>
 #include <system_error>
 #include <vector>
 
@@ -181,6 +183,16 @@ void renameOverPlaceholder(const FileLocation& from, const FileLocation& to) {
     const int reason = errno;
     unlink(to.c_str());
     throwSystemError(reason, s_cannotRename);
+}
+
+bool createPrivateFolder(const FileLocation& folder) {
+    if (mkdir(folder.c_str(), S_IRWXU) == 0)
+        return true;
+    const int reason = errno;
+    std::error_code unknown;
+    if (reason != EEXIST || !std::filesystem::is_directory(folder, unknown))
+        throwSystemError(reason, "cannot be created");
+    return false;
 }
 
 } // namespace ZULMetaData

@@ -156,6 +156,10 @@ public:
     StampResult stamp(const std::string& creatorName, const std::string& creatorVersion,
                       FragmentIndex index = FragmentIndex::Leave) const;
 
+    /// Does what `attach` and then `stamp` do, but if either fails, neither was done.
+    AttachResult attachAndStamp(const AttachPlan& plan, const std::string& creatorName,
+                                const std::string& creatorVersion, FragmentIndex index = FragmentIndex::Leave) const;
+
 private:
     FileLocation movie_;
     Progress progress_;
