@@ -25,8 +25,8 @@ LockFile::LockFile(const FileLocation& file, std::string_view note) : LockFile(f
 LockFile::LockFile(const FileLocation& file, std::string_view note, const Temporary& temporary)
     : file_(file), descriptor_(temporary.descriptor) {
     try {
-        static_cast<void>(isLockable(descriptor_.number(), LOCK_EX)); // nobody else knows the file yet
-        descriptor_.writeAt(0, {note.data(), note.size()});
+        if (isLockable(descriptor_.number(), LOCK_EX)) // an empty file counts as held
+            descriptor_.writeAt(0, {note.data(), note.size()});
         renameWithoutReplacing(temporary.name, file);
     } catch (...) {
         unlink(temporary.name.c_str());
@@ -48,7 +48,7 @@ LockFile::State LockFile::stateOf(const FileLocation& file) {
         return errno == ENOENT || errno == ENOTDIR ? State::Absent : State::Held;
     struct stat status {};
     if (fstat(found.number(), &status) != 0 || !S_ISREG(status.st_mode) || status.st_size == 0)
-        return State::Held; // an empty one is about to be replaced, see `renameOverPlaceholder`
+        return State::Held; // an empty one could not be locked, or is about to be replaced
     return isLockable(found.number(), LOCK_SH) ? State::Left : State::Held;
 }
 

@@ -24,8 +24,8 @@ public:
         Left,   ///< it ended and did not remove the file
     };
 
-    /// Creates the file, which people may read `note` in. The note must not be empty. Throws `std::system_error`, with
-    /// `std::errc::file_exists` if there is such a file.
+    /// Creates the file with `note` in it, for people. The note is not empty; without locks the file is. Throws
+    /// `std::system_error`, with `std::errc::file_exists` if there is such a file.
     LockFile(const FileLocation& file, std::string_view note);
 
     /// Looks at a file without waiting, and without keeping anybody else from looking.

@@ -53,7 +53,7 @@ nlohmann::ordered_json entryDocument(double time, const typename Kind::Value& va
         document.addList(std::apply([](const auto&... field) { return std::vector{field.key...}; }, Kind::fields),
                          value);
     else
-        ZULMetaData::detail::visitStoredFields<Kind>(
+        ZULMetaData::visitStoredFields<Kind>(
             value, [&document](const char* key, const auto& stored) { document.add(key, stored); });
     return document.finished(time);
 }

@@ -62,7 +62,11 @@ void visitForeignAtoms(RecordingFile& recording, const std::function<void(const 
 }
 
 FileInfo inspect(RecordingFile& recording) {
-    return {recording.duration(), recording.examinedStreams(), recording.creators()};
+    FileInfo file;
+    file.streams = recording.examinedStreams(); // finds the duration on its way
+    file.duration = recording.duration();
+    file.creators = recording.creators();
+    return file;
 }
 
 void writeInfo(JsonWriter& writer, RecordingFile& recording, const FileInfo& file) {

@@ -30,6 +30,9 @@ LayoutItem entryFor(const ItemWalk& items, const ContainerItem& found, bool isIn
 std::string reasonToEnd(const ItemWalk& items, const LayoutItem& entry, bool isInsideMetaData) {
     const bool isMovie = items.isMovie();
     const std::uint64_t left = items.end() - std::min(entry.item.offset, items.end());
+    if (entry.size >= entry.item.headerSize && entry.size <= left && !entry.isOpenEnded &&
+        (isMovie || entry.item.sizeField != 0))
+        return {}; // before any text is made: a movie may hold hundreds of thousands of items
     const std::string name = fmt::format("{} '{}'", isMovie ? "atom" : "chunk", printable(entry.item.type.text()));
     if (entry.isOpenEnded)
         return fmt::format("{} is open-ended, as an interrupted recording leaves it; 'zulm repair' gives it its size",

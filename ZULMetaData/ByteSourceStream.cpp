@@ -9,6 +9,11 @@ ByteSourceStream::ByteSourceStream(ByteSource source)
     exceptions(std::ios_base::badbit); // passes on what the source throws
 }
 
+void ByteSourceStream::close() {
+    setg(nullptr, nullptr, nullptr);
+    reader_ = detail::ByteReader(ByteSource::memory({}));
+}
+
 std::streambuf::int_type ByteSourceStream::underflow() {
     const std::string_view bytes = reader_.from(blockEnd_);
     char* begin = const_cast<char*>(bytes.data()); // never written to

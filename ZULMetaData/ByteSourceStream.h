@@ -16,6 +16,8 @@ class ZULMETADATA_API ByteSourceStream final : private std::streambuf, public st
 public:
     explicit ByteSourceStream(ByteSource source); ///< begins at the first byte
 
+    void close(); ///< lets go of the source; nothing can be read afterwards
+
 private:
     std::streambuf::int_type underflow() override;
     std::streambuf::pos_type seekoff(std::streambuf::off_type offset, std::ios_base::seekdir from,

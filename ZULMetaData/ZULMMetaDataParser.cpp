@@ -1,5 +1,6 @@
 #include "ZULMetaData/ZULMMetaDataParser.h"
 
+#include "ZULMetaData/ByteSourceStream.h"
 #include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/ContainerScan.h"
@@ -7,11 +8,9 @@
 #include "ZULMetaData/PositionedInput.h"
 
 #include <algorithm>
-#include <cerrno>
 #include <fstream>
 #include <iostream>
 #include <stdexcept>
-#include <system_error>
 #include <utility>
 
 namespace ZULMetaData {
@@ -38,19 +37,22 @@ struct InputFile {
     detail::FileInputBuffer buffer;
 };
 
-/// Reads a file of its own or a stream of the caller. Finds nothing before it scans.
+/// Reads a file or a source of its own, or a stream of the caller. Finds nothing before it scans.
 class Parser final : public MetaDataParser {
 public:
     Parser(const std::string& path, StreamType type)
         : file_(std::make_unique<InputFile>(path)), stream_(file_->stream), type_(type) {}
+    Parser(ByteSource source, StreamType type)
+        : source_(std::make_unique<ByteSourceStream>(std::move(source))), stream_(*source_), type_(type) {}
     Parser(std::istream& stream, StreamType type) : stream_(stream), type_(type) {}
 
     bool isOpen() const { return file_->stream.is_open(); }
-    void setStreamType(StreamType type) { type_ = type; }
 
     StreamType getStreamType() const override { return type_; }
     std::istream& getStream() override { return stream_; }
     void close() override {
+        if (source_)
+            source_->close();
         if (!file_)
             return;
         file_->stream.close();
@@ -83,7 +85,8 @@ private:
         stream_.seekg(0);
     }
 
-    std::unique_ptr<InputFile> file_; ///< null if the stream is the caller's
+    std::unique_ptr<InputFile> file_;          ///< is null if something else is read
+    std::unique_ptr<ByteSourceStream> source_; ///< is null if something else is read
     std::istream& stream_;
     StreamType type_;
 };
@@ -118,14 +121,11 @@ std::unique_ptr<MetaDataParser> MetaDataParser::create(std::istream& stream, Str
 }
 
 std::unique_ptr<MetaDataParser> openContainer(const std::string& path) {
-    errno = 0;
-    auto parser = std::make_unique<Parser>(path, Container::Unknown);
-    if (!parser->isOpen())
-        throw std::system_error(errno, std::generic_category(), "cannot be opened");
-    const auto recognized = recognizeContainer(ByteSource::stream(parser->getStream()), path);
+    ByteSource file = ByteSource::file(path);
+    const auto recognized = recognizeContainer(file, path);
     if (recognized.type == Container::Unknown)
         throw std::runtime_error(recognized.refusal());
-    parser->setStreamType(recognized.type);
+    auto parser = std::make_unique<Parser>(std::move(file), recognized.type);
     parser->scanThoroughly(ScanMessages::Printed);
     return parser;
 }

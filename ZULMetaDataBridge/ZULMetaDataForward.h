@@ -83,13 +83,10 @@ class TopmostWindowTitleMetaDataParser;
 
 struct AttachResult;
 struct AttachedStream;
-struct CaptionKey;
 class FileError;
 struct Finding;
 struct FindingRule;
 struct HumanReadableActions;
-struct KeyCaption;
-struct KeyEvent;
 struct KeyName;
 class RecordingFile;
 struct RedactedEntry;

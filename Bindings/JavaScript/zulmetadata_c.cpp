@@ -7,10 +7,10 @@
 #include "Reports/InfoReport.h"
 #include "Reports/JsonWriter.h"
 #include "Reports/Text.h"
-#include "ZULMetaDataBridge/Source/KeyCaptions.h"
 #include "ZULMetaDataBridge/Source/RecordingFile.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 #include "ZULMetaDataBridge/Source/StoredFields.h"
+#include "ZULMetaDataSession/Insights/KeyCaptions.h"
 
 #include <fmt/core.h>
 
@@ -120,14 +120,14 @@ constexpr ZulmColumnType columnType() {
 template <class Kind>
 void collect(const RecordingFile& recording, const StreamReport& stream, ZulmEntries& entries) {
     using Value = typename Kind::Value;
-    ZULMetaData::detail::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
+    ZULMetaData::visitStoredFields<Kind>(Value(), [&entries]<class Stored>(const char* key, const Stored&) {
         entries.columns.emplace_back(key, columnType<Stored>());
     });
     recording.readEntries<Value>(stream, [&entries](double time, const Value& value) {
         entries.times.push_back(time);
         auto column = entries.columns.begin();
-        ZULMetaData::detail::visitStoredFields<Kind>(
-            value, [&column](const char*, const auto& stored) { (column++)->add(stored); });
+        ZULMetaData::visitStoredFields<Kind>(value,
+                                             [&column](const char*, const auto& stored) { (column++)->add(stored); });
         return true;
     });
 }
@@ -161,13 +161,17 @@ ZulmEntries* readEntries(const ZulmRecording& opened, const StreamReport& stream
 /// Collects one row for each key.
 void collectKeyCaptions(const RecordingFile& recording, const StreamReport& stream, bool showsKeys,
                         ZulmEntries& entries) {
-    std::vector<KeyEvent> keys;
-    recording.readEntries<KeyStroke>(stream, [&keys](double time, const KeyStroke& key) {
-        keys.push_back({time, key});
+    std::vector<double> times;
+    std::vector<KeyInput> keys;
+    recording.readEntries<KeyStroke>(stream, [&](double time, const KeyStroke& key) {
+        times.push_back(time);
+        keys.push_back(keyInputOf(key));
         return true;
     });
+    KeyCaptionOptions options;
+    options.showsKeys = showsKeys;
     entries.columns = {{"label", ZulmTexts}, {"isTyped", ZulmInt32}, {"first", ZulmInt32}, {"end", ZulmReal}};
-    for (const KeyCaption& caption : keyCaptions(std::move(keys), showsKeys)) {
+    for (const KeyCaption& caption : keyCaptions({std::move(times), std::move(keys)}, options)) {
         const auto first = static_cast<std::int32_t>(entries.times.size());
         for (const CaptionKey& key : caption.keys) {
             entries.times.push_back(key.time);

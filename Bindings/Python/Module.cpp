@@ -43,16 +43,16 @@ struct RecordedStream : StreamInfo {
 };
 
 /// What a recording was found to hold. It keeps no file open.
-struct RecordingFile {
+struct RecordingSummary {
     std::string container;
     std::optional<double> duration;
     std::vector<CreatorAttributes> creators;
     std::vector<RecordedStream> streams;
 };
 
-RecordingFile lookInto(const FileLocation& file) {
+RecordingSummary lookInto(const FileLocation& file) {
     const RecordingFile recording = openRecording(file);
-    RecordingFile found{containerName(recording.container()), recording.duration(), {}, {}};
+    RecordingSummary found{containerName(recording.container()), recording.duration(), {}, {}};
     for (const ZCAPHeader& info : recording.creators())
         found.creators.push_back(info.creator);
     for (const StreamInfo& stream : recording.streams())
@@ -191,13 +191,13 @@ void addReading(py::module_& module) {
             "Returns the whole entries, as a NumPy array of records.")
         .def("raw", bytesOf, "Returns the bytes of the stream, header included.")
         .def("__repr__", formatted("<RecordedStream {0.kind} version={0.version} offset={0.offset} bytes={0.bytes}>"));
-    py::class_<RecordingFile>(module, "RecordingFile")
+    py::class_<RecordingSummary>(module, "RecordingFile")
         .def(py::init(&lookInto), py::arg("path"))
         .def_property_readonly("container",
-                               [](const RecordingFile& file) { return py::str(file.container).attr("lower")(); })
-        .def_readonly("duration", &RecordingFile::duration)
-        .def_readonly("creators", &RecordingFile::creators)
-        .def_readonly("streams", &RecordingFile::streams);
+                               [](const RecordingSummary& file) { return py::str(file.container).attr("lower")(); })
+        .def_readonly("duration", &RecordingSummary::duration)
+        .def_readonly("creators", &RecordingSummary::creators)
+        .def_readonly("streams", &RecordingSummary::streams);
     py::class_<CreatorAttributes>(module, "Creator", "A stamp of a movie: the name of the platform and two versions.")
         .def_property_readonly("name", creatorText<&CreatorAttributes::name>,
                                "The name of the platform: 'Mac', whatever the system was.")

@@ -2,7 +2,6 @@
 
 #include "Bindings/Python/PythonTexts.h"
 #include "SharedDependencies/EndianFile.h"
-#include "ZULMetaData/StreamBufferAccess.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
 #include "ZULMetaDataBridge/Source/FileError.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
@@ -18,6 +17,8 @@
 namespace ZULMetaData::Python {
 
 namespace {
+
+constexpr std::size_t s_blockSize = 65536;
 
 std::string storedValue(const py::tuple& entry, const std::string*) {
     return storedText(entry[1]);
@@ -85,7 +86,6 @@ void StreamWriter::checked(Work work) {
     if (stream_.good())
         return;
     const int error = errno != 0 ? errno : EIO;
-    detail::StreamBufferAccess::discardPut(*stream_.rdbuf()); // closing would write part of it a second time
     throw FileError(file_, std::system_error(error, std::generic_category()));
 }
 
@@ -93,11 +93,15 @@ StreamWriter::StreamWriter(const FileLocation& file, const MetaDataKind& kind)
     : file_(utf8Path(file)), kind_(kind.type) {
     MetaDataHeader header{kind.type, kind.currentVersion, 0};
     header.fixedEntrySize = entrySizeOf(header);
+    stream_.rdbuf()->pubsetbuf(nullptr, 0);
     checked([&] {
         fileOpen(stream_, file_.c_str(), std::ios_base::binary | std::ios_base::trunc);
         stream_.write(reinterpret_cast<const char*>(&header), sizeof header);
-        stream_.flush();
     });
+}
+
+StreamWriter::~StreamWriter() {
+    writeWaiting();
 }
 
 void StreamWriter::writeFile(const FileLocation& file, const MetaDataKind& kind, const py::array& entries) {
@@ -117,17 +121,31 @@ void StreamWriter::extend(const py::array& entries) {
 }
 
 void StreamWriter::write(std::string_view bytes) {
-    checked([&] { stream_.write(bytes.data(), static_cast<std::streamsize>(bytes.size())); });
+    checked([&] {
+        if (waiting_.size() + bytes.size() > s_blockSize)
+            writeWaiting();
+        if (bytes.size() > s_blockSize)
+            stream_.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+        else
+            waiting_ += bytes;
+    });
+}
+
+void StreamWriter::writeWaiting() {
+    const std::string bytes = std::exchange(waiting_, {});
+    stream_.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
 }
 
 void StreamWriter::flush() {
-    checked([this] { stream_.flush(); });
+    checked([this] { writeWaiting(); });
 }
 
 void StreamWriter::close() {
     checked([this] {
-        if (!isClosed())
-            stream_.close();
+        if (isClosed())
+            return;
+        writeWaiting();
+        stream_.close();
     });
 }
 

@@ -21,6 +21,9 @@ class StreamWriter {
 public:
     /// Creates or empties the file. `kind` is one that `kindNamed` returns. Throws `OSError` if it cannot.
     StreamWriter(const FileLocation& file, const MetaDataKind& kind);
+    ~StreamWriter(); ///< writes what waits, as far as that is possible
+    StreamWriter(const StreamWriter&) = delete;
+    StreamWriter& operator=(const StreamWriter&) = delete;
 
     /// A whole file. Where `entries` do not fit, as for `extend`, nothing has been created or emptied.
     static void writeFile(const FileLocation& file, const MetaDataKind& kind, const py::array& entries);
@@ -36,6 +39,7 @@ public:
 
 private:
     void write(std::string_view bytes);
+    void writeWaiting();
 
     /// Does `work`, and throws `FileError` if the stream fails.
     template <class Work>
@@ -43,7 +47,8 @@ private:
 
     std::string file_;
     uuid kind_;
-    std::ofstream stream_;
+    std::ofstream stream_; ///< has no buffer: closing it must not write bytes a second time after a failure
+    std::string waiting_;  ///< bytes that are written together with those that follow
     std::uint64_t written_ = 0;
 };
 

@@ -56,9 +56,9 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         EXPECT_EQ(file.path().filename(), name + ".schema.json");
         commands.push_back(name.substr(5));
     }
-    EXPECT_THAT(commands,
-                testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "extract", "grep",
-                                              "info", "redact", "repair", "salvage", "stamp", "verify", "view"));
+    EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "edits",
+                                                        "extract", "grep", "info", "redact", "repair", "salvage",
+                                                        "stamp", "verify", "view"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
@@ -68,6 +68,20 @@ TEST_F(Schema, RefusesWhatIsNotInIt) {
     EXPECT_EQ(
         runProgram("/usr/bin/python3", {"-m", "jsonschema", schemaOf("info"), "-i", folder / "document.json"}).exitCode,
         1);
+}
+
+TEST_F(Schema, HoldsForEditLists) {
+    const std::string begin = R"({"schema": "zulm.edits", "schema_version": 1, "pieces": [)";
+    expectValid({begin + "]}", begin + R"({"start": "10", "end": "61/3", "speed": "3/2"}]})",
+                 begin + R"({"at": 0, "duration": "0.5"}, {"start": 1, "end": 2e1, "speed": 0.5}]})"});
+    for (const char* piece :
+         {R"({"start": 1})", R"({"start": 1, "at": 1, "duration": 1})", R"({"start": -1, "end": 1})",
+          R"({"start": "1e1", "end": 20})", R"({"start": 0, "end": "1/0"})", R"({"start": 0, "end": "0.0"})",
+          R"({"at": 1, "duration": 1, "speed": 2})"}) {
+        const std::string file = written("edits.json", begin + piece + "]}");
+        EXPECT_EQ(runProgram("/usr/bin/python3", {"-m", "jsonschema", schemaOf("edits"), "-i", file}).exitCode, 1)
+            << piece;
+    }
 }
 
 TEST_F(Schema, HoldsForInfo) {

@@ -15,6 +15,7 @@
 #include <stdexcept>
 #include <string>
 #include <system_error>
+#include <vector>
 
 namespace ZULMetaData::Test {
 
@@ -132,6 +133,29 @@ TEST(ByteReader, ReturnsWhatTheSourceHoldsHoweverItIsAskedFor) {
         ASSERT_EQ(reader.at(position, size), expected) << position << ' ' << size;
         ASSERT_EQ(reader.at(position, size / 2), expected.substr(0, size / 2));
     }
+}
+
+/// Returns how many bytes each read asked for while headers of 16 bytes were read at every `distance`.
+std::vector<std::size_t> readSizes(std::uint64_t distance) {
+    std::vector<std::size_t> sizes;
+    constexpr std::uint64_t size = 1 << 20;
+    detail::ByteReader reader(ByteSource(size, [&sizes](std::uint64_t, std::span<char> bytes) {
+        sizes.push_back(bytes.size());
+        return bytes.size();
+    }));
+    for (std::uint64_t position = 0; position < size; position += distance)
+        reader.at(position, 16);
+    return sizes;
+}
+
+TEST(ByteReader, ReadsLargeBlocksIfHeadersLieNearEachOther) {
+    EXPECT_LT(readSizes(75).size(), 30U);
+    EXPECT_LT(readSizes(2000).size(), 30U);
+    EXPECT_EQ(readSizes(75)[1], 4096U);
+}
+
+TEST(ByteReader, ReadsSmallBlocksIfHeadersLieFarApart) {
+    EXPECT_EQ(readSizes(10000), std::vector<std::size_t>(105, 2048));
 }
 
 TEST(ByteReader, HasNoNumberWhoseBytesDoNotExist) {

@@ -8,7 +8,6 @@
 
 #include <algorithm>
 #include <functional>
-#include <sstream>
 #include <system_error>
 
 namespace ZULMetaData::Test {
@@ -88,8 +87,7 @@ protected:
 
     std::string redacted(const std::string& recording, const RecordingRedaction& redaction,
                          MetaDataParser::StreamType type = MetaDataParser::QuickTime) {
-        std::istringstream input(recording);
-        result = RecordingRedactor(input, type, redaction).write(folder / "copy");
+        result = RecordingRedactor(ByteSource::memory(recording), type, redaction).write(folder / "copy");
         return contentsOf(folder / "copy");
     }
 
@@ -255,10 +253,10 @@ TEST_F(RecordingRedactionTest, ComparesShortTextsWithTheTextsOfTheMovie) {
     const auto stays = [&](const std::string& stored, const std::string& chapter) {
         RecordingRedaction redaction;
         redaction.streams.removedKinds = {kind(s_appNames)};
-        std::istringstream input(media() + atom("moov", atom("udta", chapterList(chapter))) +
-                                 zulmAtom({names(stored)}));
+        const std::string movie =
+            media() + atom("moov", atom("udta", chapterList(chapter))) + zulmAtom({names(stored)});
         try {
-            RecordingRedactor(input, MetaDataParser::QuickTime, redaction).preview();
+            RecordingRedactor(ByteSource::memory(movie), MetaDataParser::QuickTime, redaction).preview();
         } catch (const RedactionError&) {
             return true;
         }
@@ -370,12 +368,12 @@ TEST_F(RecordingRedactionTest, BlanksStreamsInFreeSpace) {
 }
 
 TEST_F(RecordingRedactionTest, PreviewsWhatItWouldDo) {
-    std::istringstream input(media() + atom("moov", atom("udta", chapterList("x"))) +
-                             zulmAtom({names(s_secret), locationStream()}));
+    const std::string movie =
+        media() + atom("moov", atom("udta", chapterList("x"))) + zulmAtom({names(s_secret), locationStream()});
     std::vector<double> times;
     RecordingRedaction redaction = hidingWithChapters("ala");
     redaction.streams.onEntry = [&times](const RedactedEntry& entry) { times.push_back(entry.time); };
-    RecordingRedactor redactor(input, MetaDataParser::QuickTime, redaction);
+    RecordingRedactor redactor(ByteSource::memory(movie), MetaDataParser::QuickTime, redaction);
     const RedactedRecording preview = redactor.preview();
     EXPECT_THAT(times, ElementsAre(1));
     ASSERT_EQ(preview.streams.size(), 2U);
@@ -401,9 +399,9 @@ TEST_F(RecordingRedactionTest, SurvivesEveryDamageOfAMovieWithChapters) {
         for (const char value : {'\0', '\1', '\x7f', '\xff'}) {
             std::string damaged = movie;
             damaged[at] = value;
-            std::istringstream input(damaged);
             try {
-                RecordingRedactor(input, MetaDataParser::QuickTime, hidingWithChapters("ala")).write(folder / "copy");
+                RecordingRedactor(ByteSource::memory(damaged), MetaDataParser::QuickTime, hidingWithChapters("ala"))
+                    .write(folder / "copy");
                 ++copies;
                 EXPECT_THAT(contentsOf(folder / "copy"), Not(HasSubstr(s_secret))) << at;
             } catch (const RedactionError&) {

@@ -7,7 +7,6 @@ zulm_add_tests(ZULMetaDataBridgeTests
   HumanReadableActionsTest
   InputVocabularyTest
   Validation/InvalidCorpusTest
-  KeyCaptionsTest
   KeyNamesTest
   KindsTest
   MediaFilesTest

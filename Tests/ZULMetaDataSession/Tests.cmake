@@ -1,2 +1,12 @@
-zulm_add_tests(ZULMetaDataSessionTests RecordingTest TrackTest)
-    target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)
+zulm_add_tests(ZULMetaDataSessionTests
+  EditListTest
+  Insights/ChaptersTest
+  Insights/ClicksTest
+  Insights/IdleTest
+  Insights/KeyCaptionsTest
+  RationalTest
+  RecordingClockTest
+  RecordingTest
+  SessionWriterTest
+  TrackTest)
+target_link_libraries(ZULMetaDataSessionTests PRIVATE ZULMetaData::Session ZULMetaDataInvalidCorpus)

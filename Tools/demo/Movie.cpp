@@ -2,10 +2,11 @@
 
 #include "Platform/Image.h"
 #include "Tools/demo/Session.h"
-#include "ZULMetaData/Containers/AtomFormat.h"
 
+#include <cstddef>
 #include <cstdint>
 #include <initializer_list>
+#include <string>
 #include <string_view>
 #include <vector>
 
@@ -16,11 +17,14 @@ namespace {
 constexpr std::uint32_t s_width = 320;
 constexpr std::uint32_t s_height = 180;
 constexpr std::uint32_t s_length = s_timescale * s_duration;
+constexpr std::size_t s_atomHeaderSize = 8;
 
 /// As movies store numbers.
 std::string number(std::uint32_t value) {
-    const auto bytes = detail::bigEndianBytes(value);
-    return {bytes.begin(), bytes.end()};
+    std::string bytes;
+    for (int shift = 24; shift >= 0; shift -= 8)
+        bytes += static_cast<char>(value >> shift & 0xff);
+    return bytes;
 }
 
 std::string number16(std::uint32_t value) {
@@ -35,7 +39,7 @@ std::string atom(std::string_view type, std::initializer_list<std::string> parts
     std::string payload;
     for (const std::string& part : parts)
         payload += part;
-    return number(static_cast<std::uint32_t>(detail::s_atomHeaderSize + payload.size())).append(type) + payload;
+    return number(static_cast<std::uint32_t>(s_atomHeaderSize + payload.size())).append(type) + payload;
 }
 
 /// Evening sky over a dark ground.
@@ -91,7 +95,7 @@ std::string movieAtom(std::uint32_t sampleOffset, std::size_t sampleSize) {
 std::string stillMovie() {
     const std::string type = atom("ftyp", {"qt  ", number(0x200), "qt  "});
     const std::string sample = picture();
-    const auto sampleOffset = static_cast<std::uint32_t>(type.size() + detail::s_atomHeaderSize);
+    const auto sampleOffset = static_cast<std::uint32_t>(type.size() + s_atomHeaderSize);
     return type + atom("mdat", {sample}) + movieAtom(sampleOffset, sample.size());
 }
 

@@ -5,7 +5,7 @@
 #include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "ZULMetaDataBridge/Source/KeyCaptions.h"
+#include "ZULMetaDataSession/Insights/KeyCaptions.h"
 
 #include <fmt/core.h>
 
@@ -24,8 +24,8 @@ struct ConvertOptions {
     CaptionFormat format = CaptionFormat::SRT;
     std::string output;
     std::vector<std::string> kinds;
+    KeyCaptionOptions captions;
     std::optional<double> pause;
-    bool showsKeys = false;
     bool force = false;
 };
 
@@ -50,11 +50,7 @@ private:
     template <class Kind>
     void readKind(const StreamInfo& stream) {
         if constexpr (std::same_as<typename Kind::Value, KeyStroke>) {
-            std::vector<KeyEvent> keys;
-            walk<KeyStroke>(stream, [&](double time, const KeyStroke& key) { keys.push_back({time, key}); });
-            const double pause = options_.pause.value_or(s_captionPause);
-            for (const KeyCaption& caption : keyCaptions(std::move(keys), options_.showsKeys, pause))
-                captions_.push_back({caption.start, caption.end, caption.text});
+            readKeys(stream);
         } else if constexpr (std::same_as<typename Kind::Value, std::string>) {
             std::string last = "\n"; // no title is like it
             walk<std::string>(stream, [&](double time, const std::string& stored) {
@@ -64,6 +60,18 @@ private:
                 last = text;
             });
         }
+    }
+
+    void readKeys(const StreamInfo& stream) {
+        std::vector<double> times;
+        std::vector<KeyInput> keys;
+        walk<KeyStroke>(stream, [&](double time, const KeyStroke& key) {
+            times.push_back(time);
+            keys.push_back(keyInputOf(key));
+        });
+        const Track<KeyboardActionKind> track(std::move(times), std::move(keys));
+        for (const KeyCaption& caption : keyCaptions(track, options_.captions))
+            captions_.push_back({caption.start, caption.end, caption.text});
     }
 
     static std::string titleOf(const std::string& stored) {
@@ -172,7 +180,7 @@ void addConvertCommand(CLI::App& app, Action& chosen) {
                     "captions, slideTitles and topmostWindowTitle as chapters");
     addSeconds(*command, "--pause", options->pause,
                "Begin a new caption after a pause of this length; the default is 1 second");
-    command->add_flag("--show-keys", options->showsKeys, "Show what was typed, passwords included");
+    command->add_flag("--show-keys", options->captions.showsKeys, "Show what was typed, passwords included");
     command->add_flag("--force", options->force, "Replace OUT where it exists");
     command->footer("zulm convert --to srt Recording.mp4 -o Recording.srt\n"
                     "zulm convert --to ffmetadata Recording.mp4 | ffmpeg -i Recording.mp4 -i - -map_metadata 1 -c copy "
@@ -180,7 +188,8 @@ void addConvertCommand(CLI::App& app, Action& chosen) {
     command->callback([options, &chosen] {
         requireKinds("--stream", options->kinds, "has neither keystrokes nor texts",
                      []<class Kind>() { return OneOf<typename Kind::Value, std::string, KeyStroke>; });
-        requirePauseInRange(options->pause.value_or(s_captionPause));
+        options->captions.pause = options->pause.value_or(options->captions.pause);
+        requirePauseInRange(options->captions.pause);
         chosen = [options] { return runConvert(*options); };
     });
 }

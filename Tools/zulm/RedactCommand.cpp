@@ -209,8 +209,7 @@ ExitCode redact(const RedactOptions& options, RunReport& report) {
                 visit(entry);
         };
     return orFailure(options, [&] {
-        RecordingRedactor redactor(recording.parser().getStream(), recording.container(), redaction,
-                                   progressOf(options));
+        RecordingRedactor redactor(recording.bytes(), recording.container(), redaction, progressOf(options));
         if (redactor.isEmpty())
             return complainAboutNothing(recording, {});
         return options.dryRun ? preview(options, redactor, visit, report) : write(options, redactor, report);

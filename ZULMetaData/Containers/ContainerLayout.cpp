@@ -26,21 +26,24 @@ void ItemWalk::takeSizesLiterally() {
     sizes_ = detail::ExtendedSizes::Marked;
 }
 
+/// Builds the item where the caller wants it: in a movie of many fragments, copies of items take most of the time.
 std::optional<ContainerItem> ItemWalk::itemAt(std::uint64_t position) const {
-    if (first_ && position == 0)
-        return first_;
+    std::optional<ContainerItem> item = position == 0 ? first_ : std::nullopt;
+    if (item)
+        return item;
     detail::ByteCursor cursor(*reader_, position, end_);
-    ContainerItem item;
-    const bool isRead = isMovie() ? readAtomHeader(cursor, sizes_, item) : readChunkHeader(cursor, item);
-    return isRead ? std::optional(item) : std::nullopt;
+    item.emplace();
+    if (!(isMovie() ? readAtomHeader(cursor, sizes_, *item) : readChunkHeader(cursor, *item)))
+        item.reset();
+    return item;
 }
 
 std::optional<ContainerItem> ItemWalk::next() {
-    const auto item = position_ < end_ ? itemAt(position_) : std::nullopt;
-    if (!item)
-        return std::nullopt;
-    const std::uint64_t following = after(*item);
-    position_ = following > item->offset ? following : end_;
+    auto item = position_ < end_ ? itemAt(position_) : std::nullopt;
+    if (item) {
+        const std::uint64_t following = after(*item);
+        position_ = following > item->offset ? following : end_;
+    }
     return item;
 }
 

@@ -15,9 +15,26 @@ namespace {
 constexpr std::array<FourCC, 3> s_riffSignatures{"RIFF", "RF64", "BW64"};
 
 /// What movies begin with. Any other printable type may be the beginning of a text.
-constexpr std::array<FourCC, 20> s_firstAtoms{"ftyp", "styp", "moov", "moof", "mdat", "free", "skip",
-                                              "wide", "pnot", "sidx", "ssix", "prft", "emsg", "uuid",
-                                              "meta", "mfra", "udta", "pdin", "ZULM", "ZULR"};
+constexpr std::array<FourCC, 20> s_firstAtoms{"ftyp",
+                                              "styp",
+                                              "moov",
+                                              "moof",
+                                              "mdat",
+                                              "skip",
+                                              "pnot",
+                                              "sidx",
+                                              "ssix",
+                                              "prft",
+                                              "emsg",
+                                              "uuid",
+                                              "meta",
+                                              "udta",
+                                              "pdin",
+                                              detail::s_freeAtom,
+                                              detail::s_spareAtom,
+                                              detail::s_fragmentIndexAtom,
+                                              detail::s_metaDataAtom,
+                                              detail::s_recordingInfoAtom};
 
 struct ForeignSignature {
     std::string_view bytes;

@@ -52,7 +52,8 @@ ZULMETADATA_API RecognizedContainer recognizeContainer(const ByteSource& file, c
 
 /// Opens a file as `MetaDataParser::create` does, but takes it for what `recognizeContainer` says, and finds the
 /// streams after a RIFF chunk of 64-bit or unknown size as well. Throws `std::system_error` if the file cannot be
-/// opened or read, and `std::runtime_error` with the refusal if it can hold no metadata.
+/// opened or read, and `std::runtime_error` with the refusal if it can hold no metadata. The stream of the parser
+/// throws `std::system_error` too if reading fails later.
 ZULMETADATA_API std::unique_ptr<MetaDataParser> openContainer(const std::string& path);
 
 /// The same for a stream of the caller, which must outlive the parser. Throws `std::system_error` if reading fails.

@@ -48,7 +48,7 @@ RecordingFile::RecordingFile(std::string path, std::string name, std::optional<B
       })) {}
 
 std::optional<double> RecordingFile::duration() const {
-    return movieDuration(bytes_, container());
+    return validation_ ? validation_->duration : movieDuration(bytes_, container());
 }
 
 std::vector<ZCAPHeader> RecordingFile::creators() const {

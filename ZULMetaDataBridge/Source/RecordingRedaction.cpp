@@ -2,7 +2,6 @@
 
 #include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaData/Containers/ContainerLayout.h"
-#include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/RecordingInfo.h"
 #include "ZULMetaDataBridge/Source/MetaDataSection.h"
 #include "ZULMetaDataBridge/Source/RecordingCopy.h"
@@ -11,10 +10,10 @@
 #include "ZULMetaDataBridge/Source/StreamSalvage.h"
 
 #include <algorithm>
-#include <cstring>
 #include <fstream>
 #include <limits>
 #include <optional>
+#include <system_error>
 #include <utility>
 
 namespace ZULMetaData {
@@ -36,12 +35,12 @@ std::uint64_t offsetOf(std::ostream& out) {
 
 class RecordingRedactor::Work {
 public:
-    Work(std::istream& recording, Container::Type type, RecordingRedaction redaction, Progress progress)
-        : redaction_(std::move(redaction)), progress_(std::move(progress)), parser_(openContainer(recording, type)),
-          file_(ByteSource::stream(recording)), total_(file_.size()) {
+    Work(ByteSource recording, Container::Type type, RecordingRedaction redaction, Progress progress)
+        : redaction_(std::move(redaction)), progress_(std::move(progress)), file_(std::move(recording)),
+          container_(type), total_(file_.size()) {
         if (!progress_)
             progress_ = [](Step, std::uint64_t, std::uint64_t) {};
-        streams_ = detail::streamsIn(*parser_, file_);
+        streams_ = detail::streamsIn(file_, container());
         items_ = topLevelItems(file_, container());
         media_ = detail::placesIn(file_, container());
         choosePlaces();
@@ -63,21 +62,25 @@ public:
             failToWrite<RedactionError>();
         std::vector<RedactedStream> streams = writeContents(out);
         finishCopy<RedactionError>(out, copy);
-        std::ifstream written;
-        fileOpen(written, utf8Path(copy).c_str(), std::ios::binary);
-        if (!written.is_open())
-            throw RedactionError(Reason::CannotWrite, std::string("cannot be read back: ") + std::strerror(errno));
-        const std::uint64_t size = ByteSource::stream(written).size();
+        const ByteSource written = opened(copy);
         std::uint64_t done = 0;
         check_->requireClean(written, container(), [&](std::uint64_t bytes) {
             done += bytes;
-            progress_(Step::Checking, done, size);
+            progress_(Step::Checking, done, written.size());
         });
         return result(std::move(streams));
     }
 
 private:
-    Container::Type container() const { return parser_->getStreamType(); }
+    static ByteSource opened(const FileLocation& copy) {
+        try {
+            return ByteSource::file(utf8Path(copy));
+        } catch (const std::system_error& error) {
+            throw RedactionError(Reason::CannotWrite, "cannot be read back: " + error.code().message());
+        }
+    }
+
+    Container::Type container() const { return container_; }
     bool isMovie() const { return container() == Container::QuickTime; }
 
     void choosePlaces() {
@@ -265,8 +268,8 @@ private:
 
     RecordingRedaction redaction_;
     Progress progress_;
-    std::unique_ptr<MetaDataParser> parser_;
     ByteSource file_;
+    Container::Type container_;
     std::uint64_t total_;
     std::vector<detail::StreamPart> streams_;
     std::vector<ContainerItem> items_; ///< at the top level
@@ -280,9 +283,9 @@ private:
     std::uint64_t unreachable_ = 0;
 };
 
-RecordingRedactor::RecordingRedactor(std::istream& recording, Container::Type type, RecordingRedaction redaction,
+RecordingRedactor::RecordingRedactor(ByteSource recording, Container::Type type, RecordingRedaction redaction,
                                      Progress progress)
-    : work_(std::make_unique<Work>(recording, type, std::move(redaction), std::move(progress))) {}
+    : work_(std::make_unique<Work>(std::move(recording), type, std::move(redaction), std::move(progress))) {}
 
 RecordingRedactor::~RecordingRedactor() = default;
 

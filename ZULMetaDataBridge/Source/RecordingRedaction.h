@@ -2,20 +2,20 @@
 
 // Copies a whole recording without what nobody else should see: its streams, the texts of its movie, and who made it.
 //
-//     std::ifstream recording("Recording.mp4", std::ios::binary);
 //     RecordingRedaction redaction;
 //     redaction.streams.clearsKeys = true;
 //     redaction.removesChapters = true;
+//     const ByteSource recording = ByteSource::file("Recording.mp4");
 //     RecordingRedactor(recording, Container::QuickTime, redaction).write("Public.mp4");
 
 #include "../../Platform/FileLocation.h"
 #include "../../SharedDependencies/Callback.h"
 #include "../../SharedDependencies/Export.h"
-#include "../../ZULMetaData/ZULMMetaDataParser.h"
+#include "../../ZULMetaData/ByteSource.h"
+#include "../../ZULMetaData/Containers/ContainerType.h"
 #include "StreamRedaction.h"
 
 #include <cstdint>
-#include <istream>
 #include <memory>
 #include <stdexcept>
 #include <string>
@@ -102,9 +102,8 @@ public:
     /// Called now and then with the bytes of a step that are done. What it throws ends the work.
     using Progress = Callback<void(Step step, std::uint64_t done, std::uint64_t total)>;
 
-    /// `recording` is the caller's and must outlive this. Throws `std::system_error` if it cannot be read.
-    RecordingRedactor(std::istream& recording, Container::Type type, RecordingRedaction redaction,
-                      Progress progress = {});
+    /// Throws `std::system_error` if the recording cannot be read.
+    RecordingRedactor(ByteSource recording, Container::Type type, RecordingRedaction redaction, Progress progress = {});
     ~RecordingRedactor();
     RecordingRedactor(const RecordingRedactor&) = delete;
     RecordingRedactor& operator=(const RecordingRedactor&) = delete;

@@ -2,10 +2,14 @@
 
 // The fields of an entry with the values that are stored, for programs that show all of them. An `EntryDictionary` has
 // the same keys, but narrows its numbers, ends texts at their first zero byte and knows a key by its code alone.
+//
+//     visitStoredFields<CursorLocationKind>(point, [](const char* key, std::int32_t number) {
+//         std::cout << key << '=' << number << '\n';
+//     });
 
-#include "ZULMetaDataBridge/Source/EntryTexts.h"
-#include "ZULMetaDataBridge/Source/KeyNames.h"
-#include "ZULMetaDataBridge/Source/MetaDataKinds.h"
+#include "EntryTexts.h"
+#include "KeyNames.h"
+#include "MetaDataKinds.h"
 
 #include <concepts>
 #include <cstddef>
@@ -17,11 +21,11 @@
 #include <type_traits>
 #include <utility>
 
-namespace ZULMetaData::detail {
+namespace ZULMetaData {
 
-/// Returns the field of this number: an integer or a real number of the type that is stored; a text; or, for the image
-/// of a cursor, the cursor. Texts of a list are converted from ISO 8859-1, and empty if the list ends before them;
-/// other texts are the stored bytes.
+namespace detail {
+
+/// Returns the field of this number.
 template <class Kind, std::size_t Index>
 decltype(auto) storedField(const typename Kind::Value& value) {
     using Value = typename Kind::Value;
@@ -37,13 +41,17 @@ decltype(auto) storedField(const typename Kind::Value& value) {
         return Result(std::invoke(field.valueOf, value));
 }
 
-/// Calls `visit` with the key and the stored value of every field of the kind, in their order.
+} // namespace detail
+
+/// Calls `visit` with the key and the stored value of every field of the kind, in their order. A value is an integer or
+/// a real number of the type that is stored; a text; or, for the image of a cursor, the cursor. Texts of a list are
+/// converted from ISO 8859-1, and are empty if the list ends before them. Other texts are the stored bytes.
 template <class Kind, class Visit>
 void visitStoredFields(const typename Kind::Value& value, Visit visit) {
     [&]<std::size_t... Index>(std::index_sequence<Index...>) {
-        (visit(std::get<Index>(Kind::fields).key, storedField<Kind, Index>(value)), ...);
+        (visit(std::get<Index>(Kind::fields).key, detail::storedField<Kind, Index>(value)), ...);
     }
     (std::make_index_sequence<std::tuple_size_v<decltype(Kind::fields)>>());
 }
 
-} // namespace ZULMetaData::detail
+} // namespace ZULMetaData

@@ -180,6 +180,7 @@ def run(context):
         for case in cases(small_streams(context)):
             check_case(context, root, case, context.zulm, problem_of, result)
         entries = "20" if context.full else "2"
-        session = Case("recording", ["session", ".", entries], {"Movie.mp4": OPEN_MOVIE})
-        check_case(context, root, session, context.program("recorder"), damage_of, result)
+        for name in ("session", "one-session"):
+            session = Case(f"recording a {name}", [name, ".", entries], {"Movie.mp4": OPEN_MOVIE})
+            check_case(context, root, session, context.program("recorder"), damage_of, result)
     return result

@@ -131,10 +131,25 @@ TEST(ContainerRecognition, OpensAFileByItsContents) {
     EXPECT_EQ(streamsOf(*parser), (std::vector<FoundStream>{{kind(s_cursorLocations), 62, 56}}));
 }
 
+TEST(ContainerRecognition, ClosesTheFileThatItOpened) {
+    const TemporaryFolder folder;
+    writeFile(folder / "Recording.mp4", media() + zulmAtom({locationStream()}));
+    const auto parser = openContainer(folder / "Recording.mp4");
+    std::map<uuid, std::string> streams;
+    parser->loadAllData(streams);
+    EXPECT_EQ(streams.at(kind(s_cursorLocations)), locationStream());
+    parser->close();
+    EXPECT_EQ(parser->fileDataForUUID(kind(s_cursorLocations)).length, 56U);
+    streams.clear();
+    parser->loadAllData(streams);
+    EXPECT_TRUE(streams.empty() || streams.at(kind(s_cursorLocations)).empty());
+}
+
 TEST(ContainerRecognition, ThrowsForWhatItCannotOpen) {
     const TemporaryFolder folder;
     writeFile(folder / "Zeros.mp4", std::string(5000, '\0'));
     EXPECT_THROW(openContainer(folder / "missing.mp4"), std::system_error);
+    EXPECT_THROW(openContainer(folder / "."), std::system_error);
     EXPECT_THROW(openContainer(folder / "Zeros.mp4"), std::runtime_error);
 }
 

@@ -6,6 +6,8 @@
 #include "Tests/ZULMetaDataBridge/KindSamples.h"
 #include "ZULMetaData/ZULMetaData.h"
 
+#include <gtest/gtest.h>
+
 #include <algorithm>
 #include <set>
 #include <stdexcept>

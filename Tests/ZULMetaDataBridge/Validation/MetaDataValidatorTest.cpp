@@ -8,6 +8,8 @@
 #include "Tests/ZULMetaData/WatchedStream.h"
 #include "Tests/ZULMetaDataBridge/KindSamples.h"
 
+#include <gtest/gtest.h>
+
 #include <algorithm>
 #include <limits>
 #include <new>

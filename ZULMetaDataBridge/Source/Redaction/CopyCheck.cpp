@@ -1,5 +1,6 @@
 #include "ZULMetaDataBridge/Source/Redaction/CopyCheck.h"
 
+#include "ZULMetaData/ByteSourceStream.h"
 #include "ZULMetaData/Containers/ContainerRecognition.h"
 #include "ZULMetaData/Containers/RecordingInfo.h"
 #include "ZULMetaDataBridge/Source/KindEntries.h"
@@ -38,11 +39,13 @@ bool isPlaceholder(const RedactedEntry& entry) {
 
 } // namespace
 
-std::vector<StreamPart> streamsIn(MetaDataParser& recording, const ByteSource& file) {
+std::vector<StreamPart> streamsIn(const ByteSource& file, Container::Type type) {
+    ByteSourceStream input(file);
+    const auto recording = openContainer(input, type);
     std::vector<StreamPart> streams;
-    for (const uuid& type : recording.getAvailableMetaDataUUIDs()) {
-        const auto [offset, length] = recording.fileDataForUUID(type);
-        streams.push_back({type, offset, length, file.part(offset, length)});
+    for (const uuid& kind : recording->getAvailableMetaDataUUIDs()) {
+        const auto [offset, length] = recording->fileDataForUUID(kind);
+        streams.push_back({kind, offset, length, file.part(offset, length)});
     }
     return streams;
 }
@@ -98,18 +101,17 @@ void CopyCheck::requireNoTextStays(const MediaPlaces& media) const {
                          "texts that are to go are in the movie too: " + places);
 }
 
-void CopyCheck::requireClean(std::istream& copy, Container::Type type,
+void CopyCheck::requireClean(const ByteSource& copy, Container::Type type,
                              const std::function<void(std::uint64_t)>& advance) const {
-    const ByteSource bytes = ByteSource::stream(copy);
-    for (const StreamPart& stream : streamsIn(*openContainer(copy, type), bytes))
+    for (const StreamPart& stream : streamsIn(copy, type))
         requireCleanStream(stream);
     if (type == Container::RawStream)
         return;
     if (hasTexts())
-        requireCleanTexts(placesIn(bytes, type));
-    requireCleanBytes(bytes, type, advance);
+        requireCleanTexts(placesIn(copy, type));
+    requireCleanBytes(copy, type, advance);
     if (redaction_.removesCreator)
-        requireNeutralInfo(bytes, type);
+        requireNeutralInfo(copy, type);
 }
 
 /// A redaction that is applied once more must find nothing to do.

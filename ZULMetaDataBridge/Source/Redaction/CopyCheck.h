@@ -3,13 +3,14 @@
 // Looks for what a copy must lack: before it is written, in the texts of the movie, and afterwards, in every byte.
 
 #include "SharedDependencies/ZCAPHeader.h"
-#include "ZULMetaData/ZULMMetaDataParser.h"
+#include "ZULMetaData/ByteSource.h"
+#include "ZULMetaData/Containers/ContainerType.h"
 #include "ZULMetaDataBridge/Source/RecordingRedaction.h"
 #include "ZULMetaDataBridge/Source/Redaction/MediaPlaces.h"
 #include "ZULMetaDataBridge/Source/Redaction/TextSearch.h"
 
 #include <functional>
-#include <istream>
+#include <vector>
 
 namespace ZULMetaData::detail {
 
@@ -22,7 +23,7 @@ struct StreamPart {
 };
 
 /// Returns the streams that readers find, in the order of their identifiers.
-std::vector<StreamPart> streamsIn(MetaDataParser& recording, const ByteSource& file);
+std::vector<StreamPart> streamsIn(const ByteSource& file, Container::Type type);
 
 /// Returns chapters, titles and captions of a container, and nothing for a stream file.
 MediaPlaces placesIn(const ByteSource& file, Container::Type type);
@@ -39,7 +40,7 @@ public:
     void requireNoTextStays(const MediaPlaces& media) const;
 
     /// Throws `RedactionError` if the copy holds anything that was to go.
-    void requireClean(std::istream& copy, Container::Type type,
+    void requireClean(const ByteSource& copy, Container::Type type,
                       const std::function<void(std::uint64_t)>& advance) const;
 
 private:

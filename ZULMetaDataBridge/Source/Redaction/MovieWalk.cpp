@@ -2,6 +2,7 @@
 #include "ZULMetaDataBridge/Source/Redaction/TextSearch.h"
 #include "ZULMetaDataBridge/Source/Redaction/TextTrack.h"
 
+#include "ZULMetaData/Containers/AtomFormat.h"
 #include "ZULMetaDataBridge/Source/EntryTexts.h"
 
 #include <algorithm>
@@ -14,11 +15,12 @@ namespace ZULMetaData::detail {
 
 namespace {
 
-constexpr std::array<FourCC, 16> s_topTypes{"ftyp", "styp", "moov", "moof", "mfra", "mdat", "imda", "sidx",
-                                            "ssix", "prft", "pdin", "meta", "meco", "emsg", "pnot", "PICT"};
+constexpr std::array<FourCC, 16> s_topTypes{
+    "ftyp", "styp", "moov", "moof", "mdat", "imda", "sidx", "ssix",
+    "prft", "pdin", "meta", "meco", "emsg", "pnot", "PICT", s_fragmentIndexAtom};
 constexpr std::array<FourCC, 12> s_containerAtoms{"moov", "trak", "mdia", "minf", "stbl", "edts",
-                                                  "dinf", "mvex", "moof", "traf", "mfra", "gmhd"};
-constexpr std::array<FourCC, 4> s_unusedAtoms{"free", "skip", "wide", "junk"};
+                                                  "dinf", "mvex", "moof", "traf", "gmhd", s_fragmentIndexAtom};
+constexpr std::array<FourCC, 4> s_unusedAtoms{s_freeAtom, s_spareAtom, "skip", "junk"};
 constexpr std::array<FourCC, 5> s_tableAtoms{"stsz", "stz2", "stsc", "stco", "co64"};
 /// Tags that name programs, as paths show them.
 constexpr std::array<std::string_view, 3> s_programs{"/\xc2\xa9too",

@@ -1,5 +1,7 @@
 #include "ZULMetaDataBridge/Source/Redaction/ContainerBytes.h"
 
+#include "ZULMetaData/Containers/AtomFormat.h"
+
 #include <algorithm>
 #include <array>
 
@@ -13,7 +15,7 @@ constexpr std::array<FourCC, 4> s_lists{"RIFF", "RF64", "BW64", "LIST"};
 constexpr std::array<FourCC, 5> s_textLists{"INFO", "adtl", "exif", "PRMI", "ncdt"};
 constexpr std::array<FourCC, 10> s_textChunks{"bext", "iXML", "axml", "aXML", "_PMX",
                                               "id3 ", "ID3 ", "DISP", "strn", "Titl"};
-constexpr std::array<FourCC, 4> s_unusedChunks{"JUNK", "junk", "PAD ", "FLLR"};
+constexpr std::array<FourCC, 4> s_unusedChunks{s_junkChunk, "junk", "PAD ", "FLLR"};
 
 class RIFFWalk : PlaceWalk {
 public:

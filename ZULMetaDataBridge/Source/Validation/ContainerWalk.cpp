@@ -81,10 +81,8 @@ private:
 
     std::optional<ContainerItem> nextItem(ItemWalk& items, const std::string& around) {
         const std::uint64_t position = items.position();
-        if (position >= items.end())
-            return std::nullopt;
-        const auto item = items.next();
-        if (!item)
+        auto item = items.next();
+        if (!item && position < items.end())
             log_.add(report_.findings, FindingCode::TrailingBytes, around, position, "it ends with ",
                      items.end() - position, " bytes, too few for a header");
         return item;

@@ -1,4 +1,6 @@
-#include "ZULMetaDataBridge/Source/KeyCaptions.h"
+#include "ZULMetaDataSession/Insights/KeyCaptions.h"
+
+#include "Tests/ZULMetaDataSession/Insights/Tracks.h"
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -6,6 +8,7 @@
 #include <cstdint>
 #include <limits>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace ZULMetaData::Test {
@@ -26,19 +29,26 @@ constexpr std::uint32_t s_up = 38;
 
 const std::string s_bullet = "\xe2\x80\xa2";
 
+KeyCaptionOptions shown(double pause = 1) {
+    KeyCaptionOptions options;
+    options.showsKeys = true;
+    options.pause = pause;
+    return options;
+}
+
 std::string label(std::uint32_t code, std::uint32_t flags = 0) {
-    return keyCaptions({{1, {code, flags}}}, true).at(0).text;
+    return keyCaptions(keys({{1, {code, flags}}}), shown()).at(0).text;
 }
 
 std::string maskedLabel(std::uint32_t code, std::uint32_t flags = 0) {
-    return keyCaptions({{1, {code, flags}}}, false).at(0).text;
+    return keyCaptions(keys({{1, {code, flags}}})).at(0).text;
 }
 
-std::vector<KeyEvent> typed(double time, const std::string& text) {
-    std::vector<KeyEvent> keys;
+Track<KeyboardActionKind> typed(double time, const std::string& text) {
+    std::vector<std::pair<double, KeyStroke>> entries;
     for (const char c : text)
-        keys.push_back({time, {static_cast<unsigned char>(c), 0}});
-    return keys;
+        entries.emplace_back(time, KeyStroke{static_cast<unsigned char>(c), 0});
+    return keys(entries);
 }
 
 std::vector<std::string> textsOf(const std::vector<KeyCaption>& captions) {
@@ -103,31 +113,39 @@ TEST(KeyCaptions, MaskEveryKeyThatTypesACharacter) {
 }
 
 TEST(KeyCaptions, EndAtAPauseOrTheReturnKey) {
-    const std::vector<KeyEvent> keys{
-        {1, {'H', 0}}, {1.25, {'I', 0}}, {1.5, {s_return, 0}}, {1.75, {'O', 0}}, {3, {'K', 0}}};
-    const std::vector<KeyCaption> captions = keyCaptions(keys, true);
+    const Track<KeyboardActionKind> track =
+        keys({{1, {'H', 0}}, {1.25, {'I', 0}}, {1.5, {s_return, 0}}, {1.75, {'O', 0}}, {3, {'K', 0}}});
+    const std::vector<KeyCaption> captions = keyCaptions(track, shown());
     EXPECT_THAT(textsOf(captions), ElementsAre("HI [returnKey]", "O", "K"));
     EXPECT_EQ(captions[0].start, 1);
     EXPECT_EQ(captions[0].end, 3);
     EXPECT_EQ(captions[1].start, 1.75);
     EXPECT_EQ(captions[1].end, 3.25);
-    EXPECT_THAT(textsOf(keyCaptions(keys, true, 0.25)), ElementsAre("H", "I", "[returnKey]", "O", "K"));
-    EXPECT_THAT(textsOf(keyCaptions(keys, true, 5)), ElementsAre("HI [returnKey]", "OK"));
+    EXPECT_THAT(textsOf(keyCaptions(track, shown(0.25))), ElementsAre("H", "I", "[returnKey]", "O", "K"));
+    EXPECT_THAT(textsOf(keyCaptions(track, shown(5))), ElementsAre("HI [returnKey]", "OK"));
 }
 
 TEST(KeyCaptions, AreNoLongerThanALine) {
-    EXPECT_THAT(textsOf(keyCaptions(typed(1, std::string(50, 'x')), true)),
+    EXPECT_THAT(textsOf(keyCaptions(typed(1, std::string(50, 'x')), shown())),
                 ElementsAre(std::string(42, 'x'), std::string(8, 'x')));
-    const std::vector<KeyCaption> masked = keyCaptions(typed(1, std::string(50, 'x')), false);
+    const std::vector<KeyCaption> masked = keyCaptions(typed(1, std::string(50, 'x')));
     EXPECT_EQ(masked.at(0).text.size(), 42 * s_bullet.size()) << "a line is counted in characters";
+    KeyCaptionOptions options = shown();
+    options.lineLength = 2;
+    EXPECT_THAT(textsOf(keyCaptions(keys({{1, {'a', 0}}, {1, {'b', 0}}, {1, {s_return, 0}}, {1, {'c', 0}}}), options)),
+                ElementsAre("ab", "[returnKey]", "c"));
 }
 
 TEST(KeyCaptions, HoldTheirKeysInTheOrderOfTheirTimes) {
     const double nan = std::numeric_limits<double>::quiet_NaN();
     const double infinity = std::numeric_limits<double>::infinity();
-    const std::vector<KeyCaption> captions = keyCaptions(
-        {{2, {'S', s_command}}, {nan, {'x', 0}}, {1.5, {'b', 0}}, {1, {'a', 0}}, {1.5, {'c', 0}}, {infinity, {'y', 0}}},
-        true);
+    const std::vector<KeyCaption> captions = keyCaptions(keys({{2, {'S', s_command}},
+                                                               {nan, {'x', 0}},
+                                                               {1.5, {'b', 0}},
+                                                               {1, {'a', 0}},
+                                                               {1.5, {'c', 0}},
+                                                               {infinity, {'y', 0}}}),
+                                                         shown());
     ASSERT_THAT(textsOf(captions), ElementsAre("abc \xe2\x8c\x98S"));
     std::vector<std::string> labels;
     std::vector<double> times;
@@ -142,8 +160,37 @@ TEST(KeyCaptions, HoldTheirKeysInTheOrderOfTheirTimes) {
     EXPECT_THAT(areTyped, ElementsAre(true, true, true, false));
 }
 
+TEST(KeyCaptions, StayAfterTheirLastKey) {
+    KeyCaptionOptions options;
+    options.hold = 4;
+    EXPECT_EQ(keyCaptions(typed(1, "a"), options).at(0).end, 5);
+}
+
+TEST(KeyCaptions, AreMadeOfWhatTheKeySaysWhateverIsStored) {
+    KeyInput key;
+    key.isVirtualKey = true;
+    key.code = static_cast<std::uint32_t>(VirtualKey::Tab);
+    key.modifiers = {Modifier::Shift};
+    EXPECT_EQ(keyCaptions(trackOf<KeyboardActionKind>({{1, key}})).at(0).text, "\xe2\x87\xa7[tab]");
+}
+
+TEST(KeyCaptions, AreMadeOfAMillionKeysAtOneTime) {
+    constexpr std::size_t count = 1'000'000;
+    const Track<KeyboardActionKind> track(std::vector<double>(count, 1e300),
+                                          std::vector<KeyInput>(count, keyInputOf({0xffffffff, 0})));
+    EXPECT_EQ(keyCaptions(track).size(), 23'810U) << "lines of 42";
+}
+
+TEST(KeyCaptions, SayWhichKeysTypeACharacter) {
+    for (const KeyStroke& key : {KeyStroke('a', 0), KeyStroke(' ', s_shift), KeyStroke('A', s_virtualKey | s_lock)})
+        EXPECT_TRUE(typesCharacter(keyInputOf(key))) << key;
+    for (const KeyStroke& key : {KeyStroke(s_return, 0), KeyStroke('s', s_command), KeyStroke(s_up, s_virtualKey),
+                                 KeyStroke('A', s_virtualKey | s_control)})
+        EXPECT_FALSE(typesCharacter(keyInputOf(key))) << key;
+}
+
 TEST(KeyCaptions, AreNoneIfNoKeyWasPressed) {
-    EXPECT_THAT(keyCaptions({}, true), IsEmpty());
+    EXPECT_THAT(keyCaptions({}), IsEmpty());
 }
 
 } // namespace

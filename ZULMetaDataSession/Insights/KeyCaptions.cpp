@@ -1,13 +1,10 @@
-#include "ZULMetaDataBridge/Source/KeyCaptions.h"
+#include "ZULMetaDataSession/Insights/KeyCaptions.h"
 
 #include "SharedDependencies/UTF8.h"
-#include "ZULMetaDataBridge/Source/InputVocabulary.h"
 #include "ZULMetaDataBridge/Source/KeyNames.h"
 
 #include <algorithm>
 #include <array>
-#include <cmath>
-#include <cstddef>
 #include <cstdint>
 #include <string_view>
 #include <utility>
@@ -15,9 +12,6 @@
 namespace ZULMetaData {
 
 namespace {
-
-constexpr double s_hold = 1.5; ///< seconds that a caption stays after its last key
-constexpr std::size_t s_lineLength = 42;
 
 constexpr auto s_mask = "\xe2\x80\xa2"; // bullet
 
@@ -78,20 +72,22 @@ std::string typedBy(const KeyInput& key, const KeyName& name) {
     return key.isVirtualKey ? typedByVirtualKey(key) : std::string();
 }
 
-CaptionKey captionKey(const KeyEvent& event, bool showsKeys) {
-    const KeyInput key = keyInputOf(event.key);
-    const KeyName name = keyNameOf(event.key);
-    const std::string typed = typedBy(key, name);
-    if (typed.empty())
-        return {event.time, signsOf(key.modifiers) + "[" + name.text + "]", false};
-    const std::string shown = showsKeys ? typed : s_mask;
-    if (makeShortcut(key.modifiers))
-        return {event.time, signsOf(key.modifiers) + shown, false};
-    return {event.time, shown, true};
+KeyName captionNameOf(const KeyInput& key) {
+    return keyNameOf({key.code, key.isVirtualKey ? s_virtualKeyFlag : 0});
 }
 
-bool endsLine(const KeyStroke& key) {
-    return keyNameOf(key).text == "returnKey";
+CaptionKey captionKey(double time, const KeyInput& key, const KeyName& name, bool showsKeys) {
+    const std::string typed = typedBy(key, name);
+    if (typed.empty())
+        return {time, signsOf(key.modifiers) + "[" + name.text + "]", false};
+    const std::string shown = showsKeys ? typed : s_mask;
+    if (makeShortcut(key.modifiers))
+        return {time, signsOf(key.modifiers) + shown, false};
+    return {time, shown, true};
+}
+
+bool endsLine(const KeyName& name) {
+    return name.text == nameOfVirtualKey(static_cast<std::uint32_t>(VirtualKey::Return));
 }
 
 /// Returns the number of characters in a UTF-8 text.
@@ -102,27 +98,30 @@ std::size_t lengthOf(const std::string& text) {
 
 } // namespace
 
-std::vector<KeyCaption> keyCaptions(std::vector<KeyEvent> keys, bool showsKeys, double pause) {
-    std::erase_if(keys, [](const KeyEvent& event) { return !std::isfinite(event.time); });
-    std::stable_sort(keys.begin(), keys.end(),
-                     [](const KeyEvent& left, const KeyEvent& right) { return left.time < right.time; });
+std::vector<KeyCaption> keyCaptions(const Track<KeyboardActionKind>& keys, const KeyCaptionOptions& options) {
     std::vector<KeyCaption> captions;
     bool isLineEnded = true;
-    for (const KeyEvent& event : keys) {
-        CaptionKey key = captionKey(event, showsKeys);
-        const bool isNew = isLineEnded || event.time - captions.back().keys.back().time >= pause ||
-                           lengthOf(captions.back().text) + lengthOf(key.label) > s_lineLength;
+    for (std::size_t i = 0; i < keys.size(); ++i) {
+        const double time = keys.times()[i];
+        const KeyName name = captionNameOf(keys.values()[i]);
+        CaptionKey key = captionKey(time, keys.values()[i], name, options.showsKeys);
+        const bool isNew = isLineEnded || time - captions.back().keys.back().time >= options.pause ||
+                           lengthOf(captions.back().text) + lengthOf(key.label) > options.lineLength;
         if (isNew)
-            captions.push_back({event.time, 0, {}, {}});
+            captions.push_back({time, 0, {}, {}});
         KeyCaption& caption = captions.back();
         if (!isNew && !(key.isTyped && caption.keys.back().isTyped))
             caption.text += ' ';
         caption.text += key.label;
-        caption.end = event.time + s_hold;
+        caption.end = time + options.hold;
         caption.keys.push_back(std::move(key));
-        isLineEnded = endsLine(event.key);
+        isLineEnded = endsLine(name);
     }
     return captions;
+}
+
+bool typesCharacter(const KeyInput& key) {
+    return !makeShortcut(key.modifiers) && !typedBy(key, captionNameOf(key)).empty();
 }
 
 } // namespace ZULMetaData

@@ -1,0 +1,30 @@
+#include "ZULMetaDataSession/AbandonedSession.h"
+
+#include "ZULMetaDataSession/SessionFolder.h"
+
+#include <filesystem>
+#include <system_error>
+
+namespace ZULMetaData {
+
+std::optional<double> AbandonedSession::lastTime() const {
+    std::optional<double> last;
+    for (const SessionStream& stream : streams_)
+        if (stream.lastTime && !(last >= stream.lastTime))
+            last = stream.lastTime;
+    return last;
+}
+
+AttachResult AbandonedSession::saveInto(const FileLocation& movie, const std::string& creatorName,
+                                        const std::string& creatorVersion, SafeMovieSave::FragmentIndex index) const {
+    AttachResult saved = detail::saveFolder(folder_, movie, creatorName, creatorVersion, index);
+    std::error_code isStillFound;
+    std::filesystem::remove(detail::lockFileIn(folder_), isStillFound);
+    return saved;
+}
+
+void AbandonedSession::removeFiles() const {
+    detail::removeSession(folder_);
+}
+
+} // namespace ZULMetaData
