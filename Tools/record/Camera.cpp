@@ -79,6 +79,7 @@ void Camera::resume(Instant instant) {
         return;
     paused_ += instant - *pausedAt_;
     pausedAt_.reset();
+    resumedAt_ = instant;
     countTicksFrom(instant);
     nextTick_ = instant;
     changed_.notify_all();
@@ -100,9 +101,11 @@ void Camera::finish(Instant end) {
         writer_.finish(length * s_pictureTimescale / s_second);
 }
 
-std::string Camera::error() const {
+std::optional<Instant> Camera::movieLength(Instant instant) const {
     const std::lock_guard lock(mutex_);
-    return error_;
+    const bool isBefore = !zero_ || instant < *zero_ || instant < resumedAt_;
+    const bool isAfter = (pausedAt_ && instant >= *pausedAt_) || (stopAt_ && instant >= *stopAt_);
+    return isBefore || isAfter ? std::nullopt : std::optional(instant - *zero_ - paused_);
 }
 
 void Camera::giveUp(const std::string& why) {
@@ -112,7 +115,7 @@ void Camera::giveUp(const std::string& why) {
             error_ = why;
     }
     changed_.notify_all();
-    events_.failed();
+    events_.failed(why);
 }
 
 void Camera::takePictures() {

@@ -22,9 +22,9 @@ namespace Recorder {
 
 /// What the camera tells, on its own threads.
 struct CameraEvents {
-    std::function<void(Instant)> started;              ///< the instant of the first frame
-    std::function<void(Instant, Position)> sawPointer; ///< at each tick
-    std::function<void()> failed;                      ///< see `Camera::error`
+    std::function<void(Instant)> started;               ///< the instant of the first frame
+    std::function<void(Instant, Position)> sawPointer;  ///< at each tick
+    std::function<void(const std::string& why)> failed; ///< the movie cannot go on
 };
 
 /// A tick of the frame rate either has a frame or counts as dropped.
@@ -53,8 +53,8 @@ public:
     std::uint64_t frames() const { return taken_; }
     std::uint64_t dropped() const { return dropped_; }
 
-    /// Returns why the movie cannot go on; empty while it can.
-    std::string error() const;
+    /// Returns how much of the movie lies before an instant; nothing for one before the first frame or in a pause.
+    std::optional<Instant> movieLength(Instant instant) const;
 
 private:
     struct Picture {
@@ -85,6 +85,7 @@ private:
     std::deque<Picture> queue_;
     std::optional<Instant> zero_;
     std::optional<Instant> pausedAt_;
+    Instant resumedAt_ = 0;
     Instant paused_ = 0; ///< of all pauses
     std::optional<Instant> stopAt_;
     Instant firstTick_ = 0;

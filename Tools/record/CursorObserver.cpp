@@ -56,20 +56,30 @@ void CursorObserver::ask(Instant instant) {
     const Reply<xcb_xfixes_get_cursor_image_reply_t> reply(
         xcb_xfixes_get_cursor_image_reply(connection_.get(), cookie, nullptr));
     if (!reply) { // there is no cursor
-        journal_.note<CursorOpacityKind>(instant, 0);
+        isVisible_ = false;
+        noteOpacity(instant);
         return;
     }
     const std::uint32_t* pixels = xcb_xfixes_get_cursor_image_cursor_image(reply.get());
     const int count = xcb_xfixes_get_cursor_image_cursor_image_length(reply.get());
     Look look{reply->width, reply->height, reply->xhot, reply->yhot, {pixels, pixels + count}};
-    const bool isVisible =
+    isVisible_ =
         std::any_of(look.pixels.begin(), look.pixels.end(), [](std::uint32_t pixel) { return pixel >> 24 != 0; });
     const Known& known = knownAs(std::move(look));
     CursorAppearance appearance;
     appearance.id = known.id;
     appearance.picture = known.picture;
     journal_.note<CursorImageKind>(instant, appearance);
-    journal_.note<CursorOpacityKind>(instant, isVisible ? 1 : 0);
+    noteOpacity(instant);
+}
+
+void CursorObserver::hidden(std::uint32_t serverTime, bool isHidden) {
+    isHidden_ = isHidden;
+    noteOpacity(clock_.instantOf(serverTime));
+}
+
+void CursorObserver::noteOpacity(Instant instant) {
+    journal_.note<CursorOpacityKind>(instant, isVisible_ && !isHidden_ ? 1 : 0);
 }
 
 const CursorObserver::Known& CursorObserver::knownAs(Look look) {

@@ -20,6 +20,9 @@ public:
 
     void changed(const xcb_xfixes_cursor_notify_event_t& event);
 
+    /// A client hides the cursor, or shows it again.
+    void hidden(std::uint32_t serverTime, bool isHidden);
+
     /// Returns the number of the extension's first event.
     std::uint8_t firstEvent() const { return firstEvent_; }
 
@@ -46,7 +49,11 @@ private:
     const ServerClock& clock_;
     Journal& journal_;
     std::uint8_t firstEvent_ = 0;
+    void noteOpacity(Instant instant);
+
     std::map<Look, Known> known_;
+    bool isVisible_ = false; ///< its image has a pixel that can be seen
+    bool isHidden_ = false;
 };
 
 } // namespace Recorder

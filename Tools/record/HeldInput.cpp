@@ -14,7 +14,8 @@ constexpr std::uint32_t s_controlFlag = 0x40000;
 } // namespace
 
 void HeldInput::addKey(Instant instant, const KeyStroke& key) {
-    keys_.push_back({instant, key});
+    const auto isLater = [instant](const Entry& entry) { return entry.instant > instant; };
+    keys_.insert(std::find_if(keys_.begin(), keys_.end(), isLater), {instant, key}); // repetitions come by another way
 }
 
 void HeldInput::addButton(Instant instant, std::int32_t action, bool isPress) {

@@ -161,13 +161,13 @@ Modifiers KeyObserver::unconsumed(xkb_keycode_t key, Modifiers held, xkb_keysym_
     return rest;
 }
 
-void KeyObserver::pressed(const xcb_input_raw_key_press_event_t& event) {
+void KeyObserver::pressed(std::uint8_t key, std::uint32_t serverTime) {
     refresh();
     if (!state_ || privacy_.mode() == KeyMode::Nothing)
         return;
-    const std::optional<Meaning> meaning = meaningOf(event.detail);
+    const std::optional<Meaning> meaning = meaningOf(key);
     if (meaning && privacy_.takesKey(!meaning->isShortcut) && !privacy_.isDenied())
-        input_.addKey(clock_.instantOf(event.time), meaning->stroke);
+        input_.addKey(clock_.instantOf(serverTime), meaning->stroke);
 }
 
 std::optional<KeyObserver::Meaning> KeyObserver::meaningOf(xkb_keycode_t key) {

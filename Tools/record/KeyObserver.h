@@ -19,7 +19,8 @@ class KeyObserver {
 public:
     KeyObserver(XConnection& connection, const ServerClock& clock, HeldInput& input, PrivacyFilter& privacy);
 
-    void pressed(const xcb_input_raw_key_press_event_t& event);
+    /// Takes a press, or its repetition.
+    void pressed(std::uint8_t key, std::uint32_t serverTime);
 
     /// Takes an event of the keyboard extension.
     void keyboardChanged(const xcb_generic_event_t& event);

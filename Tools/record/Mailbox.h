@@ -11,6 +11,7 @@
 #include <cstdint>
 #include <mutex>
 #include <optional>
+#include <string>
 #include <utility>
 #include <vector>
 
@@ -25,7 +26,7 @@ public:
     struct Mail {
         std::optional<Instant> started;
         std::vector<Sight> sights;
-        bool hasFailed = false;
+        std::string failure; ///< why the movie cannot go on
     };
 
     Mailbox() : wake_(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK)) {}

@@ -26,9 +26,7 @@ bool isEmulated(std::uint32_t flags) {
 PointerObserver::PointerObserver(XConnection& connection, const ServerClock& clock, Journal& journal, HeldInput& input)
     : connection_(connection), clock_(clock), journal_(journal), input_(input) {
     buttonsRemapped();
-    const Instant instant = now();
-    journal_.note<CursorActionKind>(instant, s_noButtonYet);
-    motion_ = instant;
+    motion_ = now();
     followMotions();
 }
 

@@ -61,6 +61,7 @@ struct RecorderLoop::Observers {
     KeyObserver keys;
     MachineObserver machine;
     WindowObserver windows;
+    TrafficObserver traffic;
 };
 
 RecorderLoop::RecorderLoop(const Options& options)
@@ -72,6 +73,7 @@ RecorderLoop::RecorderLoop(const Options& options)
         reachAccessibility();
         open();
     } catch (...) {
+        sound_.reset();
         camera_.reset();
         folder_.remove();
         throw;
@@ -95,6 +97,8 @@ void RecorderLoop::reachAccessibility() {
 }
 
 void RecorderLoop::open() {
+    if (options_.sound)
+        sound_ = std::make_unique<SoundSource>(*options_.sound);
     const VideoSettings settings = withSize(options_.video, target_.area);
     const auto makeRoom = [this] {
         isDiskFull_ = true;
@@ -105,11 +109,15 @@ void RecorderLoop::open() {
     input_ = std::make_unique<HeldInput>(*journal_, privacy_);
     const auto changed = [this](Instant instant, std::uint32_t process) { windowChanged(instant, process); };
     XConnection& x = connection_;
+    const TrafficObserver::Events traffic{
+        [this](std::uint32_t time, std::uint8_t key) { observers_->keys.pressed(key, time); },
+        [this](std::uint32_t time, bool isHidden) { observers_->cursor.hidden(time, isHidden); }};
     observers_ = std::unique_ptr<Observers>(new Observers{{x, clock_, *journal_},
                                                           {x, clock_, *journal_, *input_},
                                                           {x, clock_, *input_, privacy_},
                                                           {x, *journal_},
-                                                          {x, clock_, *journal_, privacy_, changed}});
+                                                          {x, clock_, *journal_, privacy_, changed},
+                                                          {options_.display, traffic}});
     const Area& area = target_.area;
     journal_->note<RecordingRegionKind>(now(), Rect(area.x, area.y, area.width, area.height));
     selectInput();
@@ -119,7 +127,7 @@ void RecorderLoop::open() {
         [this](Instant instant, Position pointer) {
             mailbox_.post([&](Mailbox::Mail& mail) { mail.sights.push_back({instant, pointer}); });
         },
-        [this] { mailbox_.post([](Mailbox::Mail& mail) { mail.hasFailed = true; }); }};
+        [this](const std::string& why) { mailbox_.post([&](Mailbox::Mail& mail) { mail.failure = why; }); }};
     camera_ = std::make_unique<Camera>(grabber_, *writer_, settings, events);
 }
 
@@ -147,6 +155,10 @@ void RecorderLoop::selectInput() {
 
 int RecorderLoop::run() {
     camera_->start();
+    if (sound_)
+        sound_->start(*camera_, *writer_, [this](const std::string& why) {
+            mailbox_.post([&](Mailbox::Mail& mail) { mail.failure = why; });
+        });
     while (!end_)
         observe();
     signals_.endAtNext(folder_.folder());
@@ -174,6 +186,7 @@ int RecorderLoop::run() {
 void RecorderLoop::observe() {
     waitForSomething();
     takeEvents();
+    observers_->traffic.serve();
     takeMail();
     takeFocus();
     takeSignals();
@@ -195,6 +208,7 @@ void RecorderLoop::waitForSomething() {
     wait(connection_.descriptor());
     wait(mailbox_.descriptor());
     wait(signals_.descriptor());
+    wait(observers_->traffic.descriptor()); // poll ignores a negative one
     for (const int descriptor : control_.descriptors())
         wait(descriptor);
     if (accessibility_)
@@ -248,12 +262,16 @@ void RecorderLoop::takeInput(const xcb_ge_generic_event_t& event) {
         pointer.button(reinterpret_cast<const xcb_input_raw_button_press_event_t&>(event),
                        event.event_type == XCB_INPUT_RAW_BUTTON_PRESS, buttonModifiers());
         break;
-    case XCB_INPUT_RAW_KEY_PRESS:
-        observers_->keys.pressed(reinterpret_cast<const xcb_input_raw_key_press_event_t&>(event));
-        break;
+    case XCB_INPUT_RAW_KEY_PRESS: takeKey(reinterpret_cast<const xcb_input_raw_key_press_event_t&>(event)); break;
     case XCB_INPUT_DEVICE_CHANGED: pointer.devicesChanged(); break;
     default: break;
     }
+}
+
+void RecorderLoop::takeKey(const xcb_input_raw_key_press_event_t& event) {
+    constexpr std::uint32_t highestCode = 255;
+    if (event.detail <= highestCode)
+        observers_->keys.pressed(static_cast<std::uint8_t>(event.detail), event.time);
 }
 
 /// Clicks call the key Command that keys call Windows.
@@ -272,13 +290,14 @@ void RecorderLoop::takeMail() {
         observers_->pointer.saw(sight.instant, sight.pointer);
     if (!mail.sights.empty())
         hover();
-    if (mail.hasFailed)
-        fail(camera_->error());
+    if (!mail.failure.empty())
+        fail(mail.failure);
 }
 
 void RecorderLoop::began(Instant zero) {
     zero_ = zero;
     journal_->start(zero);
+    journal_->note<CursorActionKind>(zero, s_noButtonYet);
     if (options_.duration)
         camera_->stopAt(endOfDuration());
     say("recording " + options_.output.string());
@@ -465,6 +484,7 @@ bool RecorderLoop::save() {
             return false;
         }
     };
+    sound_.reset();
     attempt([this] { camera_->finish(endInstant_); });
     takeMail();
     input_->releaseAll(endInstant_);

@@ -15,7 +15,9 @@
 #include "Tools/record/Options.h"
 #include "Tools/record/PointerObserver.h"
 #include "Tools/record/RecordingFolder.h"
+#include "Tools/record/SoundSource.h"
 #include "Tools/record/StopSignals.h"
+#include "Tools/record/TrafficObserver.h"
 #include "Tools/record/WindowObserver.h"
 
 #include <atomic>
@@ -50,6 +52,7 @@ private:
     void takeEvents();
     void takeEvent(const xcb_generic_event_t& event);
     void takeInput(const xcb_ge_generic_event_t& event);
+    void takeKey(const xcb_input_raw_key_press_event_t& event);
     ZULMetaData::Modifiers buttonModifiers() const;
     void takeMail();
     void takeSignals();
@@ -87,6 +90,7 @@ private:
     std::unique_ptr<HeldInput> input_;
     std::unique_ptr<Observers> observers_;
     std::unique_ptr<Camera> camera_;
+    std::unique_ptr<SoundSource> sound_; ///< of which nothing is there without --audio
 
     std::optional<End> end_;
     Instant endInstant_ = 0;
