@@ -158,7 +158,7 @@ void Camera::serveTick() {
         throw Failure("the X display is gone", ExitLoss);
     const std::optional<std::int64_t> time = grabbed && grabbed->pixels ? movieTime(grabbed->instant) : std::nullopt;
     if (grabbed && grabbed->hasPointer)
-        events_.sawPointer(grabbed->instant, grabbed->pointer);
+        events_.sawPointer(grabbed->pointerInstant, grabbed->pointer);
     if (!time) {
         countDropped(grabbed ? grabbed->instant : now());
         return;

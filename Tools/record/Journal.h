@@ -91,6 +91,10 @@ private:
 
 // ---------------------------------------------------------------------------------------------------------------
 
+/// Whether a kind is measured again and again, so that an equal value says something.
+template <class Kind>
+inline constexpr bool isMeasured = std::is_same_v<Kind, ZULMetaData::CPUUsageKind>;
+
 /// Whether two states of a kind are the same.
 template <class Value>
 bool isSameState(const Value& left, const Value& right) {
@@ -103,6 +107,7 @@ bool isSameState(const Value& left, const Value& right) {
 template <class Kind>
 void Journal::note(Instant instant, const Noted<Kind>& value) {
     constexpr bool isState = Kind::role == ZULMetaData::StreamRole::State;
+    constexpr bool isRepeated = !isState || isMeasured<Kind>;
     Slot<Kind>& own = slot<Kind>();
     if (!clock_.hasStarted()) {
         own.early.emplace_back(instant, value);
@@ -111,7 +116,7 @@ void Journal::note(Instant instant, const Noted<Kind>& value) {
     if constexpr (isState)
         own.held = value;
     const std::optional<double> time = timeInside(instant);
-    if (time && (!isState || !own.written || !isSameState(*own.written, value)))
+    if (time && (isRepeated || !own.written || !isSameState(*own.written, value)))
         write<Kind>(own, *time, value);
 }
 

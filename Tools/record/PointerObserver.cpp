@@ -1,5 +1,6 @@
 #include "Tools/record/PointerObserver.h"
 
+#include <algorithm>
 #include <cmath>
 
 namespace Recorder {
@@ -51,18 +52,23 @@ void PointerObserver::followMotions() {
         return;
     const Instant instant = *motion_;
     motion_.reset();
+    const Instant asked = now();
     const auto cookie = xcb_query_pointer(connection_.get(), connection_.root());
     const Reply<xcb_query_pointer_reply_t> reply(xcb_query_pointer_reply(connection_.get(), cookie, nullptr));
     if (reply && reply->same_screen)
-        saw(instant, {reply->root_x, reply->root_y});
+        note(instant, asked, {reply->root_x, reply->root_y});
 }
 
-void PointerObserver::saw(Instant instant, Position position) {
-    if (position_ == position) {
+void PointerObserver::saw(Instant asked, Position position) {
+    if (asked >= asked_) // another answer knows more than one that was asked for earlier
+        note(asked, asked, position);
+}
+
+void PointerObserver::note(Instant instant, Instant asked, Position position) {
+    asked_ = asked;
+    if (position_ == position)
         return;
-    }
-    if (instant < positionInstant_)
-        instant = positionInstant_;
+    instant = std::max(instant, positionInstant_);
     if (position_ && instant - positionInstant_ > s_rest)
         journal_.noteStill<CursorLocationKind>(instant - s_millisecond);
     position_ = position;

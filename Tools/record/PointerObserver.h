@@ -30,8 +30,8 @@ public:
     /// Asks where the pointer is if a motion was told since the last call.
     void followMotions();
 
-    /// Notes where the pointer was at an instant.
-    void saw(Instant instant, Position position);
+    /// Notes where the pointer was when that was asked.
+    void saw(Instant asked, Position position);
 
     std::optional<Position> position() const { return position_; }
 
@@ -45,6 +45,7 @@ private:
     };
 
     std::vector<ScrollAxis>& axesOf(std::uint16_t device);
+    void note(Instant instant, Instant asked, Position position);
     void scrollBy(const xcb_input_raw_motion_event_t& event);
     void noteScroll(Instant instant, std::int32_t x, std::int32_t y);
 
@@ -54,6 +55,7 @@ private:
     HeldInput& input_;
     std::optional<Position> position_;
     Instant positionInstant_ = 0;
+    Instant asked_ = 0;             ///< when the position was asked for
     std::optional<Instant> motion_; ///< of the last one whose position is not known
     std::vector<std::uint8_t> buttonMap_;
     std::map<std::uint16_t, std::vector<ScrollAxis>> axes_;

@@ -140,6 +140,7 @@ std::optional<GrabbedPicture> ScreenGrabber::grab() {
     GrabbedPicture picture;
     picture.bytesPerLine = bytesPerLine_;
     const Instant asked = now();
+    picture.pointerInstant = asked;
     const auto pointerCookie = xcb_query_pointer(connection, connection_.root());
     if (segment_ != 0) {
         const auto cookie = xcb_shm_get_image(connection, source, x, y, width, height, s_allPlanes,
@@ -164,6 +165,7 @@ std::optional<GrabbedPicture> ScreenGrabber::grab() {
 std::optional<GrabbedPicture> ScreenGrabber::askPointer() {
     GrabbedPicture picture;
     const Instant asked = now();
+    picture.pointerInstant = asked;
     if (!notePointer(xcb_query_pointer(connection_.get(), connection_.root()), picture))
         return std::nullopt;
     picture.instant = middleOf(asked, now());

@@ -19,8 +19,9 @@ struct GrabbedPicture {
     const std::uint8_t* pixels = nullptr;
     int bytesPerLine = 0;
     Instant instant = 0; ///< the middle between the request and the arrival
-    Position pointer;    ///< where the pointer was then
     bool hasPointer = false;
+    Position pointer;           ///< where the pointer was
+    Instant pointerInstant = 0; ///< when that was asked, before the pixels
 };
 
 /// How the server stores a pixel.
