@@ -429,12 +429,14 @@ void RecorderLoop::lookAfterDisk() {
         return;
     nextDiskCheck_ = instant + s_diskInterval;
     constexpr std::uint64_t bytesOfFrame = 40;
-    const std::uint64_t needed = s_mebibyte + journal_->bytes() * 2 + camera_->frames() * bytesOfFrame;
-    const std::uint64_t written = writer_->bytes();
-    constexpr auto checks = static_cast<std::uint64_t>(s_second / s_diskInterval);
-    const std::uint64_t inASecond = (written - checkedBytes_) * checks;
-    fastest_ = std::max(inASecond, fastest_ - fastest_ / checks);
-    checkedBytes_ = written;
+    if (instant >= nextRate_) {
+        nextRate_ = instant + s_second;
+        fastest_ = std::max(writer_->bytes() - ratedBytes_, fastest_ / 2);
+        ratedBytes_ = writer_->bytes();
+    }
+    // The reserve also holds what is on its way to the disk when another program takes all that was free.
+    const std::uint64_t needed =
+        2 * s_mebibyte + 2 * fastest_ + journal_->bytes() * 2 + camera_->frames() * bytesOfFrame;
     if (!folder_.reserve(needed) || folder_.freeBytes() < s_mebibyte + fastest_)
         end(End::Disk, instant);
 }
@@ -479,8 +481,7 @@ bool RecorderLoop::save() {
             work();
             return true;
         } catch (const std::exception& error) {
-            if (error_.empty())
-                error_ = error.what();
+            error_ += (error_.empty() ? "" : "; ") + std::string(error.what());
             return false;
         }
     };

@@ -100,8 +100,9 @@ private:
     std::optional<Instant> pausedAt_;
     std::optional<Position> hovered_;
     Instant nextDiskCheck_ = 0;
-    std::uint64_t checkedBytes_ = 0;
-    std::uint64_t fastest_ = 0; ///< bytes that the movie grew by in a second
+    Instant nextRate_ = 0;
+    std::uint64_t ratedBytes_ = 0; ///< of the movie when its rate was taken last
+    std::uint64_t fastest_ = 0;    ///< bytes that the movie grew by in a second
     std::uint8_t inputOpcode_ = 0;
     Instant nextStatus_ = 0;
     bool hasStatus_ = false;

@@ -19,7 +19,7 @@ namespace fs = std::filesystem;
 
 namespace {
 
-constexpr std::uint64_t s_firstReserve = std::uint64_t{1} << 20;
+constexpr std::uint64_t s_firstReserve = std::uint64_t{2} << 20;
 constexpr std::uint64_t s_leastFree = std::uint64_t{2} << 20; ///< beside the reserve, to begin at all
 
 void requireAbsent(const fs::path& path, const char* advice) {

@@ -253,7 +253,8 @@ void VideoWriter::writePendingPicture(std::int64_t nextTime) {
     packet->duration = nextTime - packet->pts;
     writePacket(*packet);
     ++frames_;
-    if (static_cast<double>(nextTime - fragmentStart_) >= s_fragmentSeconds * s_pictureTimescale) {
+    const bool isFirst = frames_ == 1; // there is something to save from the beginning
+    if (isFirst || static_cast<double>(nextTime - fragmentStart_) >= s_fragmentSeconds * s_pictureTimescale) {
         endFragment();
         fragmentStart_ = nextTime;
     }

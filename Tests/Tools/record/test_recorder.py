@@ -1,10 +1,10 @@
 """What the recorder promises, seen from outside: an X server without a screen, a person made of xdotool, and a window
 that shows what happens to it. Streams are read by streams.py, pictures by ffmpeg."""
 
-import bisect
 import json
 import os
 import pathlib
+import shutil
 import signal
 import stat
 import statistics
@@ -466,5 +466,52 @@ class Loss(Test):
             self.assertEqual(os.listdir(folder), ["a.mp4.recording"])
 
 
+class Privacy(Test):
+    """With the accessibility bus, whose address is that of the root window of the desk."""
+
+    def start_bus(self, desk):
+        bus = desk.start(["dbus-daemon", "--session", "--print-address", "--nofork"], stdout=subprocess.PIPE, text=True)
+        desk.environment["DBUS_SESSION_BUS_ADDRESS"] = bus.stdout.readline().strip()
+
+    def test_what_is_not_known_is_left_out(self):
+        """ShownWindow tells the bus nothing, so nobody knows whether it shows a password field."""
+        with Desk() as desk:
+            self.start_bus(desk)
+            desk.show()
+            for options in (["--keys", "all"], ["--keys", "shortcuts"]):
+                recording = desk.record(*options, name=options[1] + ".mp4")
+                desk.xdotool("key", "a", "F5", "ctrl+c")
+                desk.xdotool("mousemove", 600, 400, "click", 1)
+                streams = self.recorded(recording)
+                self.assertNotIn("keyboardAction", streams)
+                self.assertEqual([entry.value for entry in streams["cursorAction"]], [256, 1, 2])
+
+    def test_a_watcher_that_dies_or_hangs_harms_nothing(self):
+        for number in (signal.SIGKILL, signal.SIGSTOP):
+            with Desk() as desk:
+                self.start_bus(desk)
+                desk.show()
+                recording = desk.record("--keys", "all")
+                watchers = desk.run("pgrep", "-P", str(recording.process.pid)).split()
+                self.assertEqual(len(watchers), 1)
+                os.kill(int(watchers[0]), number)
+                for index in range(30):
+                    desk.xdotool("mousemove", 300 + index, 300)
+                    time.sleep(0.1)
+                    desk.xdotool("key", "a")
+                streams = self.recorded(recording)
+                self.assertNotIn("keyboardAction", streams)
+                self.assertEqual(streams["cursorLocation"][-1].value, (329, 300))
+
+
+def missing_programs():
+    missing = [] if PROGRAMS["recorder"] else ["the recorder, whose libraries 'scripts/install.sh record' installs"]
+    return missing + [name for name in ("Xvfb", "openbox", "xdotool", "xprop", "setxkbmap", "ffmpeg", "dbus-daemon")
+                      if not shutil.which(name)]
+
+
 if __name__ == "__main__":
+    if missing_programs():
+        print("skipped, because there is no " + ", no ".join(missing_programs()))
+        sys.exit(77)
     unittest.main(verbosity=2)
