@@ -58,11 +58,7 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
     }
     EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "edits",
                                                         "extract", "grep", "info", "insights", "redact", "repair",
-<<<<<<< HEAD
                                                         "salvage", "stamp", "state", "verify", "view"));
-=======
-                                                        "salvage", "stamp", "verify", "view"));
->>>>>>> w5-s24
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
