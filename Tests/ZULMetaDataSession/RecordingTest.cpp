@@ -96,10 +96,10 @@ TYPED_TEST(RecordingOfKind, HasTheWholeEntriesBeforeATornOne) {
 }
 
 TYPED_TEST(RecordingOfKind, VisitsTheEntriesInTheOrderOfTheStream) {
-    using Kind = typename TypeParam::Kind;
+    using Recorded = typename TypeParam::Kind;
     const MemoryRecording recording(goldenStream<TypeParam>(), "a.dat");
     std::vector<double> times;
-    recording->read<Kind>([&times](double time, const TrackValueOf<Kind>&) {
+    recording->read<Recorded>([&times](double time, const TrackValueOf<Recorded>&) {
         times.push_back(time);
         return true;
     });
