@@ -105,7 +105,7 @@ TYPED_TEST(RecordingOfKind, VisitsTheEntriesInTheOrderOfTheStream) {
     });
     EXPECT_EQ(times.size(), TypeParam::samples().size());
     std::sort(times.begin(), times.end());
-    const auto inTrack = recording->track<Kind>().times();
+    const auto inTrack = recording->track<Recorded>().times();
     EXPECT_TRUE(std::equal(times.begin(), times.end(), inTrack.begin(), inTrack.end()));
 }
 
