@@ -18,17 +18,16 @@ namespace ZULMetaData {
 
 /// What makes a zoom, and how long it lasts.
 struct ZoomOptions {
-    double groupTime = 2.5; ///< seconds from press to press, at most, in a group of clicks
-    double groupDistance =
-        0.15;                   ///< part of the screen's size; how far a click is from the middle of its group, at most
-    double typingGap = 1.5;     ///< seconds from key to key, at most, while somebody types
-    std::size_t typingKeys = 3; ///< keys, at least, that make a zoom
-    double lead = 0.4;          ///< seconds from the start of a zoom to its first click or key
-    double hold = 1.8;          ///< seconds from the last release or key to the end of a zoom
-    double mergeGap = 0.8;      ///< seconds; zooms with a shorter gap between them are one
-    double least = 1;           ///< seconds of a zoom, at least
-    double factor = 1.5;        ///< how many times larger the picture appears; at least 1
-    double stopTime = 1;        ///< seconds; the last click starts no zoom if it is this close to the end
+    double groupTime = 2.5;      ///< seconds from press to press, at most, in a group of clicks
+    double groupDistance = 0.15; ///< part of the screen's size from a click to the middle of its group, at most
+    double typingGap = 1.5;      ///< seconds from key to key, at most, while somebody types
+    std::size_t typingKeys = 3;  ///< keys, at least, that make a zoom
+    double lead = 0.4;           ///< seconds from the start of a zoom to its first click or key
+    double hold = 1.8;           ///< seconds from the last release or key to the end of a zoom
+    double mergeGap = 0.8;       ///< seconds; zooms with a shorter gap between them are one
+    double least = 1;            ///< seconds of a zoom, at least
+    double factor = 1.5;         ///< how many times larger the picture appears; at least 1
+    double stopTime = 1;         ///< seconds; the last click starts no zoom if it is this close to the end
 };
 
 /// Why a zoom goes somewhere.
