@@ -15,7 +15,7 @@ namespace {
 
 constexpr double s_longestUsualDistance = 1;  ///< in seconds
 constexpr double s_longestStay = 60;          ///< in seconds, within a movement
-constexpr double s_samplesPerSecond = 120;    ///< of a movement that is smoothed
+constexpr double s_samplesPerSecond = 120;    ///< how many points of a movement are smoothed
 constexpr std::size_t s_samplesPerCorner = 4; ///< at most
 constexpr double s_lowestCutoff = 0.001;      ///< in Hz
 constexpr double s_twoPi = 6.283185307179586;

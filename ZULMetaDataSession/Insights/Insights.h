@@ -26,13 +26,13 @@ namespace ZULMetaData {
 
 /// The parameters of all insights.
 struct InsightOptions {
-    ClickOptions clicks;        ///< of the clicks, which the path and the zooms use as well
-    KeyCaptionOptions captions; ///< of the captions
-    IdleOptions idle;           ///< of the idle spans
-    ChapterOptions chapters;    ///< of the chapters
-    CursorPathOptions path;     ///< of the path, which the camera uses as well
-    ZoomOptions zooms;          ///< of the zooms
-    CameraOptions camera;       ///< of the camera
+    ClickOptions clicks;        ///< what makes a click, for the path and the zooms as well
+    KeyCaptionOptions captions; ///< how keys are joined
+    IdleOptions idle;           ///< what counts as idle
+    ChapterOptions chapters;    ///< which changes make a chapter
+    CursorPathOptions path;     ///< how much the path is smoothed, for the camera as well
+    ZoomOptions zooms;          ///< what makes a zoom
+    CameraOptions camera;       ///< how the camera moves
 };
 
 /// What insights are made of. Copies share the entries.
@@ -46,12 +46,12 @@ struct InsightSources {
     Track<TopmostAppNameKind> applications; ///< its applications
     Track<SlideInfoTitleKind> slides;       ///< the titles of slides
     ScreenRect screen;                      ///< the recorded part of the display; without area if it is not known
-    double duration = 0;                    ///< of the recording, in seconds
+    double duration = 0;                    ///< the length of the recording, in seconds
 };
 
 /// What is known about a recording. Without a screen there are no zooms.
 struct Insights {
-    double duration = 0;              ///< of the recording, in seconds
+    double duration = 0;              ///< the length of the recording, in seconds
     ScreenRect screen;                ///< the recorded part of the display; without area if it is not known
     std::vector<Click> clicks;        ///< see `clicksOf`
     std::vector<KeyCaption> captions; ///< see `keyCaptions`
