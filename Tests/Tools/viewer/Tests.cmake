@@ -39,4 +39,10 @@ if(ZULM_VIEWER AND CHROMIUM)
       ${PROJECT_SOURCE_DIR}/Docs/viewer
     DEPENDS viewer_test_packages zulm
     VERBATIM)
+
+  # The table of figures of the documentation.
+  add_custom_target(viewer_figures
+    COMMAND ${CMAKE_COMMAND} -E env ${viewer_settings} ${NODE} ${viewer_tests}/figures.mjs
+    DEPENDS viewer_test_packages zulm
+    VERBATIM)
 endif()

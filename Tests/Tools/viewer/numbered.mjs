@@ -191,3 +191,9 @@ export async function watch(page, { times }, seconds) {
     .map(({ number, time }) => after(time, times[number]) / (times[number + 1] - times[number]));
   return differences.sort((a, b) => Math.abs(a) - Math.abs(b));
 }
+
+/// How far most of the differences are from nothing.
+export function differencesOf(differences) {
+  const at = (part) => Math.abs(differences[Math.floor((differences.length - 1) * part)]).toFixed(2);
+  return { median: at(0.5), nearlyAll: at(0.95), worst: at(1) };
+}

@@ -7,7 +7,7 @@ export type MovieState = 'none' | 'loading' | 'ready' | 'failed';
 
 const rounding = 0.000001; // seconds that browsers round times of pictures by
 const patience = 200; // milliseconds for a picture after the movie has found its place
-const calm = 0.1; // seconds for which a picture may be late before time goes on without it
+const calm = 0.1; // seconds without another picture, after which time goes on without it
 const slow = 0.05; // seconds: pictures that last longer are not all that moves
 
 export class Player {
@@ -25,6 +25,9 @@ export class Player {
   private lengths = new FrameLengths();
   /// When the picture that is shown begins; NaN until there is one.
   private picture = NaN;
+  /// When it was drawn, in milliseconds of the page, and how many pictures the browser had left out by then.
+  private shownAt = 0;
+  private droppedBefore = 0;
   /// Where the movie is to go, and where it is on its way to; undefined while it goes nowhere.
   private wanted: number | undefined;
   private sought: number | undefined;
@@ -147,7 +150,7 @@ export class Player {
     const passed = (now - this.lastTick) / 1000;
     this.lastTick = now;
     if (!this.playing) return;
-    if (this.isMovieRunning()) this.position = this.runningTime();
+    if (this.isMovieRunning()) this.position = this.runningTime(now);
     else if (this.wanted === undefined) this.position += Math.max(0, passed) * this.speed;
     if (this.position < this.duration) return;
     this.position = this.duration;
@@ -158,13 +161,20 @@ export class Player {
     return Math.max(0, Math.min(time, this.duration));
   }
 
-  /// What is drawn belongs to the picture. Where pictures last long, or the next one is very late, time goes on alone.
-  private runningTime(): number {
+  /// What is drawn belongs to the picture, in which much may move if it lasts long. Where the movie has no other picture
+  /// for a while, time goes on alone; but not where the browser only has no time to show it.
+  private runningTime(now: number): number {
     const { currentTime } = this.video;
     const { length } = this.lengths;
-    const late = currentTime - this.picture;
-    const hold = length > slow ? 0 : Math.max(calm, 3 * length) * Math.max(1, this.speed);
-    return late <= hold ? this.picture + rounding : currentTime;
+    if (Number.isNaN(this.picture)) return currentTime; // the browser does not tell
+    const isStill = (now - this.shownAt) / 1000 > Math.max(calm, 3 * length) && this.dropped() === this.droppedBefore;
+    if (isStill) return Math.max(this.picture, currentTime);
+    const most = length > slow ? 0.95 * length : 0;
+    return this.picture + Math.max(rounding, Math.min(currentTime - this.picture, most));
+  }
+
+  private dropped(): number {
+    return this.video.getVideoPlaybackQuality?.().droppedVideoFrames ?? 0;
   }
 
   private async takeSteps(): Promise<void> {
@@ -203,6 +213,7 @@ export class Player {
   private showsPicture(began: number): void {
     if (this.isMovieRunning()) this.lengths.played(this.picture, began);
     this.picture = began;
+    [this.shownAt, this.droppedBefore] = [performance.now(), this.dropped()];
     this.hasSought = true;
     if (this.followsPicture && this.wanted === undefined && !this.video.ended)
       this.position = this.limited(began + rounding);
