@@ -57,8 +57,8 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         commands.push_back(name.substr(5));
     }
     EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "edits",
-                                                        "extract", "grep", "info", "redact", "repair", "salvage",
-                                                        "stamp", "verify", "view"));
+                                                        "extract", "grep", "info", "record", "redact", "repair",
+                                                        "salvage", "stamp", "verify", "view"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
