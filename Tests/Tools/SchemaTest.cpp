@@ -57,8 +57,8 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         commands.push_back(name.substr(5));
     }
     EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "edits",
-                                                        "extract", "grep", "info", "insights", "redact", "repair",
-                                                        "salvage", "stamp", "state", "verify", "view"));
+                                                        "extract", "grep", "info", "insights", "record", "redact",
+                                                        "repair", "salvage", "stamp", "state", "verify", "view"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {

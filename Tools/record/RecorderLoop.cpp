@@ -197,6 +197,7 @@ void RecorderLoop::observe() {
     observers_->machine.poll();
     input_->release();
     journal_->flushIfDue();
+    clock_.keepUp();
     lookAfterTime();
     lookAfterDisk();
     showStatus();

@@ -8,6 +8,7 @@ namespace Recorder {
 namespace {
 
 constexpr int s_attempts = 5;
+constexpr Instant s_interval = 10 * s_second;      ///< in which no clock drifts far
 constexpr Instant s_sameClock = 5 * s_millisecond; ///< a distance that is none, but the ticks of the server
 
 /// Returns the whole time whose lower 32 bits are these milliseconds, as near to `about` as can be.
@@ -38,7 +39,13 @@ std::uint32_t ServerClock::askTime() {
     return 0;
 }
 
+void ServerClock::keepUp() {
+    if (distance_ != 0 && now() >= next_)
+        synchronize();
+}
+
 void ServerClock::synchronize() {
+    next_ = now() + s_interval;
     Instant best = 0;
     Instant shortest = std::numeric_limits<Instant>::max();
     for (int attempt = 0; attempt < s_attempts; ++attempt) {

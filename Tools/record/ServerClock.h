@@ -17,18 +17,20 @@ public:
     /// Asks the server for its time, on a connection of its own: the answers are events.
     explicit ServerClock(const std::string& display);
 
-    /// Asks again. Costs one or several answers of the server.
-    void synchronize();
+    /// Asks again if the server counts another clock and some time has passed.
+    void keepUp();
 
     /// Returns the instant of a time of an event that has just arrived; never later than the present.
     Instant instantOf(std::uint32_t serverTime) const;
 
 private:
+    void synchronize();
     std::uint32_t askTime();
 
     XConnection connection_;
     xcb_window_t window_;
     xcb_atom_t property_;
+    Instant next_ = 0;     ///< when to ask again
     Instant distance_ = 0; ///< of the server's time, as an unwrapped number, to ours
 };
 

@@ -53,6 +53,8 @@ class Files(Test):
             self.assertEqual(recording.process.wait(30), 0)
             document = json.loads(recording.json.read_text())
             times = frame_times(recording.output)
+            schema = pathlib.Path(__file__).parents[3] / "Docs/schemas/zulm.record.schema.json"
+            self.assertEqual(list(document), json.loads(schema.read_text())["required"])
             self.assertEqual(document["schema"], "zulm.record")
             self.assertEqual(document["stopped_by"], "duration")
             self.assertEqual(document["movie"], str(recording.output))
