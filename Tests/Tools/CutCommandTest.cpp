@@ -52,9 +52,11 @@ struct Frame {
 /// Frames as they are decoded and turned the right way up.
 std::vector<Frame> framesOf(const std::string& movie, int width = s_width, int height = s_height) {
     const std::string pictures =
-        outputOf("ffmpeg -v error -i '" + movie + "' -map 0:v:0 -vsync passthrough -f rawvideo -pix_fmt gray -");
-    std::istringstream times(
-        outputOf("ffprobe -v error -select_streams v:0 -show_entries frame=pts_time -of csv=p=0 '" + movie + "'"));
+        outputOf("ffmpeg -v error -i '" + movie +
+                 "' -map 0:v:0 -vsync passthrough -enc_time_base 1:90000 -f rawvideo -pix_fmt gray -");
+    std::istringstream times(outputOf(
+        "ffprobe -v error -select_streams v:0 -show_entries frame=pts_time -of default=nokey=1:noprint_wrappers=1 '" +
+        movie + "'"));
     std::vector<Frame> frames;
     const auto size = static_cast<std::size_t>(width * height);
     for (std::size_t begin = 0; begin + size <= pictures.size(); begin += size) {
@@ -325,7 +327,7 @@ TEST_F(CutCommand, CopiesThePicturesFromKeyFramesOn) {
     expectMarkerUnderCursor();
     const std::vector<Frame> frames = framesOf(out);
     EXPECT_NEAR(frames.front().marker.x, markerOf(20).x, 1);
-    EXPECT_THAT(burstsIn(out).size(), 5U); // at 1, 2; 5, 6, 7
+    EXPECT_EQ(burstsIn(out).size(), 4U); // at 1, 2; 5, 6
 }
 
 TEST_F(CutCommand, CopiesPicturesOfVaryingRateAndTurnedOnes) {

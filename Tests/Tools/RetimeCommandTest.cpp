@@ -120,7 +120,7 @@ TEST_F(RetimeCommand, LeavesHeadersIfNothingIsKept) {
 TEST_F(RetimeCommand, WantsToKnowWhatIsKept) {
     EXPECT_EQ(retime({}).exitCode, 2);
     EXPECT_EQ(retime({"--keep", "1-2", "--remove", "1-2"}).exitCode, 2);
-    for (const std::string& wrong : {"1", "1:2", "a-b", "1-2@", "1-2@fast", "1-2-3", "1e1-20", ""})
+    for (const std::string wrong : {"1", "1:2", "a-b", "1-2@", "1-2@fast", "1-2-3", "1e1-20", ""})
         EXPECT_EQ(retime({"--keep=" + wrong}).exitCode, 2) << wrong;
     EXPECT_EQ(retime({"--remove", "1-2@2"}).exitCode, 2);
     EXPECT_EQ(runTool({"retime", recording, "--keep", "1-2", "-o", out}).exitCode, 2);
@@ -148,7 +148,7 @@ TEST_F(RetimeCommand, RefusesAnEditedMovieWithMetaDataUnlessItReplacesThat) {
     const ToolResult refused = retime({"--keep", "0-10"});
     EXPECT_EQ(refused.exitCode, 1);
     EXPECT_THAT(refused.errors,
-                HasSubstr(edited + ": has metadata already: cursorLocation, topmostAppName; --replace"));
+                HasSubstr(edited + ": has metadata already: topmostAppName, cursorLocation; --replace"));
     EXPECT_THAT(namesInFolder(), ElementsAre("Edited.mp4", "Recording.mp4"));
     EXPECT_EQ(retime({"--keep", "0-10", "--replace"}).exitCode, 0);
     EXPECT_EQ(contentsOf(out),

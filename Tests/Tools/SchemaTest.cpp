@@ -153,6 +153,22 @@ TEST_F(Schema, HoldsForAttachAndStamp) {
     expectValid({outputOf({"stamp", plain, "--creator", "a", "--creator-version", "1", "-o", folder / "stamped.mp4"})});
 }
 
+TEST_F(Schema, HoldsForRetimeAndCut) {
+    const std::string plain = written("plain.mp4", tinyMovie());
+    const std::string open = written("open\xff.mp4", tinyMovie() + be32(0) + "free1234");
+    expectValid({outputOf({"retime", movie(), "--movie", plain, "--keep", "1-5@2", "-o", folder / "1.mp4"}),
+                 outputOf({"retime", odd(), "--movie", open, "--remove", "1-5", "-o", folder / "2.mp4"}),
+                 outputOf({"retime", plain, "--movie", plain, "--keep", "1-5", "-o", folder / "3.mp4"})});
+    const std::string real = folder / "real.mp4";
+    ZULMetaData::Test::outputOf("ffmpeg -v error -f lavfi -i testsrc=size=64x64:rate=10 -t 3 -c:v libx264 -g 5 " + real);
+    writeFile(real, contentsOf(real) + extendedAtom("ZULM", extendedAtom("DATA", locations())));
+    writeFile(folder / "edits.json", R"({"schema": "zulm.edits", "schema_version": 1, "pieces": [
+        {"start": 0, "end": 1, "speed": 2}, {"at": 1, "duration": 1}]})");
+    expectValid({outputOf({"cut", real, "--edits", folder / "edits.json", "-o", folder / "4.mp4"}),
+                 outputOf({"cut", real, "--fast", "--keep", "1-2", "-o", folder / "5.mp4"}),
+                 outputOf({"cut", plain, "--keep", "1-2", "-o", folder / "6.mp4"})});
+}
+
 TEST_F(Schema, KeepsTheBytesOfNamesThatAreNotUTF8) {
     const std::string strange = written("na\xff.mp4", tinyMovie());
     const std::vector<std::string> documents{

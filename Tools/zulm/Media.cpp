@@ -1,6 +1,7 @@
 #include "Tools/zulm/Media.h"
 
 #include "Tools/zulm/ChildProcess.h"
+#include "Tools/zulm/FFmpeg.h"
 #include "Tools/zulm/Failure.h"
 
 #include <fmt/core.h>
@@ -99,6 +100,12 @@ std::size_t PictureStream::shownAt(const Rational& time) const {
     return later == frames.begin() ? 0 : static_cast<std::size_t>(later - frames.begin()) - 1;
 }
 
+std::size_t PictureStream::nearestTo(const Rational& time) const {
+    const std::size_t before = shownAt(time);
+    const std::size_t after = std::min(before + 1, frames.size() - 1);
+    return secondsOf(frames[after]) - time < time - secondsOf(frames[before]) ? after : before;
+}
+
 std::size_t PictureStream::firstFrom(const Rational& time) const {
     const auto from =
         std::lower_bound(frames.begin(), frames.end(), time,
@@ -125,22 +132,6 @@ Media mediaIn(const std::string& path, const std::string& name) {
     if (media.picture)
         readPackets(path, name, *media.picture);
     return media;
-}
-
-std::string mediaAddress(const std::string& path) {
-    return "file:" + path;
-}
-
-void requireDone(const std::string& program, int exitCode, const std::string& errors, const std::string& what) {
-    if (exitCode == 0)
-        return;
-    std::string_view text = errors;
-    while (text.ends_with('\n'))
-        text.remove_suffix(1);
-    const std::size_t lastLine = text.rfind('\n');
-    text = text.substr(lastLine == std::string_view::npos ? 0 : lastLine + 1);
-    throw Failure(fmt::format("{} cannot {}: {}; nothing was written", program, what,
-                              text.empty() ? fmt::format("it ended with {}", exitCode) : std::string(text)));
 }
 
 } // namespace Zulm

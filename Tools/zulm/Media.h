@@ -34,6 +34,9 @@ struct PictureStream {
     /// one of all.
     std::size_t shownAt(const ZULMetaData::Rational& time) const;
 
+    /// Returns the place in `frames` of the frame whose time is nearest.
+    std::size_t nearestTo(const ZULMetaData::Rational& time) const;
+
     /// Returns the place in `frames` of the first frame at or after a time.
     std::size_t firstFrom(const ZULMetaData::Rational& time) const;
 };
@@ -53,11 +56,5 @@ struct Media {
 
 /// Asks ffprobe. Errors call the file `name`. Throws `Failure`.
 Media mediaIn(const std::string& path, const std::string& name);
-
-/// How ffmpeg and ffprobe are told the path of a file: a name never looks like an address or an option.
-std::string mediaAddress(const std::string& path);
-
-/// Throws `Failure` unless a program of ffmpeg ended well. `what` completes "ffmpeg cannot ...".
-void requireDone(const std::string& program, int exitCode, const std::string& errors, const std::string& what);
 
 } // namespace Zulm

@@ -91,7 +91,7 @@ Json fileDocument(const RetimeOptions& options, const EditList& edits, const Ret
     addText(file, "movie", options.movie);
     addText(file, "output", options.output);
     file.update(Json{{"pieces", edits.pieces().size()},
-                     {"duration", edits.duration().nearest()},
+                     {"duration", numberDocument(edits.duration().nearest())},
                      {"repair", repairDocument(attached.repair)},
                      {"fragment_index", fragmentIndexText(attached.fragmentIndex)},
                      {"streams", streams.documents(attached)}});
