@@ -55,19 +55,23 @@ protected:
         arguments.emplace_back("--json");
         return Json::parse(insights(arguments).output).at("files").at(0);
     }
+
+    ToolResult besideTheMovie(const std::vector<std::string>& words) const {
+        ToolOptions options;
+        options.folder = std::filesystem::path(movie()).parent_path();
+        return runTool(words, options);
+    }
 };
 
 TEST_F(InsightsCommand, ShowsWhatHappens) {
-    const ToolResult result =
-        runTool({"insights", "Recording.mp4"}, {.folder = std::filesystem::path(movie()).parent_path()});
+    const ToolResult result = besideTheMovie({"insights", "Recording.mp4"});
     EXPECT_EQ(result.exitCode, 0) << result.errors;
     EXPECT_THAT(result.errors, IsEmpty());
     expectGolden(result.output, "insights.txt");
 }
 
 TEST_F(InsightsCommand, ShowsTheSameAsJson) {
-    const ToolResult result =
-        runTool({"insights", "--json", "Recording.mp4"}, {.folder = std::filesystem::path(movie()).parent_path()});
+    const ToolResult result = besideTheMovie({"insights", "--json", "Recording.mp4"});
     EXPECT_EQ(result.exitCode, 0) << result.errors;
     expectGolden(result.output, "insights.json");
 }
@@ -167,7 +171,9 @@ TEST_F(InsightsCommand, EndsWithThreeIfSomethingIsDamaged) {
 }
 
 TEST_F(InsightsCommand, ReadsStandardInput) {
-    const ToolResult result = runTool({"insights", "-"}, {.input = contentsOf(movie())});
+    ToolOptions options;
+    options.input = contentsOf(movie());
+    const ToolResult result = runTool({"insights", "-"}, options);
     EXPECT_EQ(result.exitCode, 0) << result.errors;
     EXPECT_THAT(result.output, testing::StartsWith("-: 20.000 s, 6 clicks"));
 }
