@@ -56,9 +56,10 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         EXPECT_EQ(file.path().filename(), name + ".schema.json");
         commands.push_back(name.substr(5));
     }
-    EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "edits",
-                                                        "extract", "grep", "info", "insights", "record", "redact",
-                                                        "repair", "salvage", "stamp", "state", "verify", "view"));
+    EXPECT_THAT(commands,
+                testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "edits",
+                                              "extract", "grep", "info", "insights", "record", "redact", "repair",
+                                              "retime", "salvage", "stamp", "state", "verify", "view"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
@@ -160,7 +161,8 @@ TEST_F(Schema, HoldsForRetimeAndCut) {
                  outputOf({"retime", odd(), "--movie", open, "--remove", "1-5", "-o", folder / "2.mp4"}),
                  outputOf({"retime", plain, "--movie", plain, "--keep", "1-5", "-o", folder / "3.mp4"})});
     const std::string real = folder / "real.mp4";
-    ZULMetaData::Test::outputOf("ffmpeg -v error -f lavfi -i testsrc=size=64x64:rate=10 -t 3 -c:v libx264 -g 5 " + real);
+    ZULMetaData::Test::outputOf("ffmpeg -v error -f lavfi -i testsrc=size=64x64:rate=10 -t 3 -c:v libx264 -g 5 " +
+                                real);
     writeFile(real, contentsOf(real) + extendedAtom("ZULM", extendedAtom("DATA", locations())));
     writeFile(folder / "edits.json", R"({"schema": "zulm.edits", "schema_version": 1, "pieces": [
         {"start": 0, "end": 1, "speed": 2}, {"at": 1, "duration": 1}]})");
