@@ -1,11 +1,21 @@
 #include "ZULMetaDataSession/AbandonedSession.h"
 
+#include "Platform/LockFile.h"
 #include "ZULMetaDataSession/SessionFolder.h"
 
 #include <filesystem>
 #include <system_error>
 
 namespace ZULMetaData {
+
+AbandonedSession::AbandonedSession(const FileLocation& folder) : folder_(folder) {
+    const std::string name = utf8Path(folder);
+    if (!detail::orSessionError(name, [&] { return std::filesystem::is_directory(folder); }))
+        throw Error(name, "is no folder, so it holds no session");
+    if (LockFile::stateOf(detail::lockFileIn(folder)) == LockFile::State::Held)
+        throw Error(name, "is still in use; finish the recording first");
+    streams_ = detail::streamsIn(folder);
+}
 
 std::optional<double> AbandonedSession::lastTime() const {
     std::optional<double> last;

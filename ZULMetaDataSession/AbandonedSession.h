@@ -15,7 +15,6 @@
 #include <cstdint>
 #include <optional>
 #include <string>
-#include <utility>
 #include <vector>
 
 namespace ZULMetaData {
@@ -31,12 +30,12 @@ struct SessionStream {
     std::string name() const { return metaDataKindName(type); } ///< returns the name of its kind
 };
 
-/// A session that `SessionWriter::abandoned` found.
+/// What a session left in its folder. `SessionWriter::abandoned` finds such folders.
 class ZULMETADATA_API AbandonedSession {
 public:
-    /// Takes the folder of a session, and its stream files as they were measured.
-    AbandonedSession(FileLocation folder, std::vector<SessionStream> streams)
-        : folder_(std::move(folder)), streams_(std::move(streams)) {}
+    /// Looks into the folder of a session, even if it was saved before. Throws `Error` if there is no such folder, if a
+    /// stream file cannot be read, and if the process of the session is alive.
+    explicit AbandonedSession(const FileLocation& folder);
 
     const FileLocation& folder() const { return folder_; }                 ///< where it recorded
     const std::vector<SessionStream>& streams() const { return streams_; } ///< its stream files, in the order of kinds

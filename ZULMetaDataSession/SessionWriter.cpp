@@ -27,20 +27,10 @@ constexpr auto s_lockNote = "A session is recorded into this folder as long as t
 /// The largest text or picture: sizes of entries have 32 bits, and no entry has more than 64 bytes beside it.
 constexpr std::uint64_t s_largestValue = std::numeric_limits<std::uint32_t>::max() - std::uint64_t{64};
 
-/// A burst is so many readings of the clock in a row that all return the same time. In a burst the clock is not read for
-/// some entries after each reading. No recorder is that fast, but a program that copies a recording is.
+/// A burst is so many readings of the clock in a row that all return the same time. In a burst the clock is not read
+/// for some entries after each reading. No recorder is that fast, but a program that copies a recording is.
 constexpr std::uint32_t s_readingsOfABurst = 4096;
 constexpr std::uint32_t s_unwatchedOfABurst = 7;
-
-/// The first entry creates a stream that is absent. An open stream takes entries, a closed or failed one takes none.
-enum class Stage : std::uint8_t { Absent, Open, Closed, Failed };
-
-struct StreamSlot {
-    Stage stage = Stage::Absent;
-    std::uint64_t entries = 0;
-    std::unique_ptr<NewFile> file;
-    std::ostream stream{nullptr};
-};
 
 /// How values are passed: those of a fixed size in registers, since what was just put into memory in parts is slow to
 /// read as a whole.
@@ -74,6 +64,17 @@ private:
 } // namespace
 
 struct SessionWriter::State {
+    /// The first entry creates a stream that is absent. An open stream takes entries, a closed or failed one takes
+    /// none.
+    enum class Stage : std::uint8_t { Absent, Open, Closed, Failed };
+
+    struct StreamSlot {
+        Stage stage = Stage::Absent;
+        std::uint64_t entries = 0;
+        std::unique_ptr<NewFile> file;
+        std::ostream stream{nullptr};
+    };
+
     State(const FileLocation& sessionFolder, SessionOptions sessionOptions);
     State(const State&) = delete;
     State& operator=(const State&) = delete;
@@ -401,7 +402,7 @@ std::vector<AbandonedSession> SessionWriter::abandoned(const FileLocation& folde
     std::vector<AbandonedSession> sessions;
     for (const FileLocation& candidate : folders)
         if (LockFile::stateOf(detail::lockFileIn(candidate)) == LockFile::State::Left)
-            sessions.emplace_back(candidate, detail::streamsIn(candidate));
+            sessions.emplace_back(candidate);
     return sessions;
 }
 

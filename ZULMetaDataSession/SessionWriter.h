@@ -65,6 +65,7 @@ struct SessionOptions {
     std::chrono::nanoseconds flushInterval = std::chrono::milliseconds(500);
 
     /// Called once, on the caller's thread, when the first entry was lost. It may use the session, but not destroy it.
+    /// What it throws passes through the function that lost the entry.
     Callback<void(const Error& loss)> onLoss = {};
 
     /// The clock by which the interval is measured, counted from any time. It never goes backward. If it is empty, the

@@ -10,6 +10,7 @@
 #include "Insights/Clicks.h"
 #include "Insights/CursorPath.h"
 #include "Insights/Idle.h"
+#include "Insights/Insights.h"
 #include "Insights/KeyCaptions.h"
 #include "Insights/Zooms.h"
 #include "Picture.h"

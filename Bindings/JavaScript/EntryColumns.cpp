@@ -5,6 +5,7 @@
 
 #include <array>
 #include <cmath>
+#include <cstring>
 
 namespace ZULMetaData::Bindings {
 
@@ -31,10 +32,15 @@ void EntryColumn::add(const Text& text) {
 }
 
 void EntryColumn::add(const Blob& bytes) {
-    if (bytes)
-        addDistinct({reinterpret_cast<const char*>(bytes->data()), bytes->size()});
-    else
+    if (!bytes) {
         add(std::uint32_t{ZulmNothing});
+    } else if (bytes == lastBlob_) { // a cursor keeps its picture for a while
+        add(lastPlace_);
+    } else {
+        addDistinct({reinterpret_cast<const char*>(bytes->data()), bytes->size()});
+        lastBlob_ = bytes;
+        std::memcpy(&lastPlace_, values_.data() + values_.size() - sizeof lastPlace_, sizeof lastPlace_);
+    }
 }
 
 EntryColumn EntryColumn::of(const TableColumn& column) {

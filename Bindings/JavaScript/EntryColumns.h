@@ -51,6 +51,8 @@ private:
     std::string pool_;
     std::vector<std::uint64_t> ends_;
     std::unordered_map<std::string, std::uint32_t> places_; ///< among the distinct texts or bytes
+    Blob lastBlob_;                                         ///< that was added
+    std::uint32_t lastPlace_ = 0;                           ///< of it among them
 };
 
 } // namespace ZULMetaData::Bindings

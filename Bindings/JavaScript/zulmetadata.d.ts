@@ -110,16 +110,6 @@ export class Recording {
   entries(kind: string): Entries;
   /** Returns the entries of a hidden stream, by its index in `hidden`. */
   hiddenEntries(index: number): Entries;
-  /**
-   * Returns the keys of the stream "keyboardAction" as captions show them, in the order of their times. Throws a
-   * `ZulmError` if there is no such stream. The columns are:
-   *
-   * - `label`, the text of the key. Unless `showsKeys` is true, a bullet takes the place of what was typed.
-   * - `isTyped`, 1 for a character without modifiers, which makes words with its neighbours, or 0.
-   * - `first`, the index of the key that begins its caption.
-   * - `end`, the time in seconds until which its caption is shown.
-   */
-  keyCaptions(showsKeys?: boolean): Entries;
   /** Returns the entries of a kind with a finite time, in the order of their times. */
   track(kind: string): Entries;
   /**
@@ -130,7 +120,11 @@ export class Recording {
   at(times: Iterable<number>, options?: { interpolate?: 'linear' | 'none' }): Table;
   /**
    * Returns what follows from the recording. `parameters` change the defaults that Docs/insights.md lists, by their
-   * names in lower case with underscores, such as `{ least: 3 }`.
+   * names in lower case with underscores, such as `{ least: 3 }`. The columns are described in `zulmetadata_c.h`.
+   *
+   * Captions have one row for each key: `label`, its text; `is_typed`, 1 for a character without modifiers, which makes
+   * words with its neighbours; `first`, the row that begins its caption; `end`, until when its caption is shown. Unless
+   * `shows_keys` is true, a bullet takes the place of what was typed.
    */
   insights(
     name: 'clicks' | 'captions' | 'idle' | 'chapters' | 'zooms' | 'cursor_path' | 'camera',

@@ -264,12 +264,6 @@ export class Recording {
     });
   }
 
-  keyCaptions(showsKeys) {
-    return this.#guarded((core) =>
-      core.takeEntries(core.call('zulm_read_key_captions', this.#handle, showsKeys ? 1 : 0), 'keyboardAction'),
-    );
-  }
-
   track(kind) {
     const { time, columns } = this.entries(kind);
     const rows = Uint32Array.from(time.keys()).filter((row) => Number.isFinite(time[row]));

@@ -11,7 +11,6 @@
 #include "ZULMetaDataBridge/Source/RecordingFile.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 #include "ZULMetaDataBridge/Source/StoredFields.h"
-#include "ZULMetaDataSession/Insights/KeyCaptions.h"
 
 #include <fmt/core.h>
 
@@ -44,8 +43,8 @@ struct ZulmRecording {
         ZulmStream summary; // points into these texts
     };
 
-    ZulmRecording(const ByteSource& bytes, const std::string& name)
-        : bytes(bytes), recording(bytes, name), duration(recording.duration()),
+    ZulmRecording(const ByteSource& source, const std::string& name)
+        : bytes(source), recording(source, name), duration(recording.duration()),
           found(summarized(recording.examinedStreams())), hidden(summarized(recording.hiddenStreams())) {}
 
     /// Returns what tables are made from. It is opened at the first call.
@@ -169,31 +168,6 @@ ZulmEntries* readEntries(const ZulmRecording& opened, const StreamReport& stream
     });
 }
 
-/// Collects one row for each key.
-void collectKeyCaptions(const RecordingFile& recording, const StreamReport& stream, bool showsKeys,
-                        ZulmEntries& entries) {
-    std::vector<double> times;
-    std::vector<KeyInput> keys;
-    recording.readEntries<KeyStroke>(stream, [&](double time, const KeyStroke& key) {
-        times.push_back(time);
-        keys.push_back(keyInputOf(key));
-        return true;
-    });
-    KeyCaptionOptions options;
-    options.showsKeys = showsKeys;
-    entries.columns = {{"label", ZulmTexts}, {"isTyped", ZulmInt32}, {"first", ZulmInt32}, {"end", ZulmReal}};
-    for (const KeyCaption& caption : keyCaptions({std::move(times), std::move(keys)}, options)) {
-        const auto first = static_cast<std::int32_t>(entries.times.size());
-        for (const CaptionKey& key : caption.keys) {
-            entries.times.push_back(key.time);
-            entries.columns[0].add(key.label);
-            entries.columns[1].add(std::int32_t{key.isTyped});
-            entries.columns[2].add(first);
-            entries.columns[3].add(caption.end);
-        }
-    }
-}
-
 std::vector<StreamReport> streamsNamed(const ZulmRecording& opened, const char* kinds) {
     std::vector<StreamReport> streams;
     if (!kinds) {
@@ -300,15 +274,6 @@ ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind) {
 
 ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index) {
     return orNull([&] { return readEntries(*recording, recording->hidden[index].report); });
-}
-
-ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys) {
-    return orNull([&] {
-        const StreamReport& stream = streamNamed(*recording, metaDataKindName(KeyboardActionKind::type));
-        return entriesOf(*recording, stream, [&](ZulmEntries& entries) {
-            collectKeyCaptions(recording->recording, stream, showsKeys != 0, entries);
-        });
-    });
 }
 
 ZulmEntries* zulm_states(ZulmRecording* recording, const double* times, size_t count, int32_t interpolates) {

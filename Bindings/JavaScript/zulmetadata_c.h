@@ -96,13 +96,7 @@ typedef struct {
 ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind);
 ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index);
 
-/* Returns the keys of the stream keyboardAction as captions show them, in the order of their times. The columns are
-   "label", the text of the key; "isTyped", 1 if the key makes words with its neighbours that are typed, or 0; "first",
-   the number of the entry that begins its caption; and "end", the seconds until which its caption is shown. If
-   `showsKeys` is 0, bullets take the place of what was typed. */
-ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys);
-
-/* What holds at each of these times, in seconds. The columns are "x" and "y" of the cursor, "cursor_id", "hotspot_x",
+/* Returns what holds at each of these times, in seconds. The columns are "x" and "y" of the cursor, "cursor_id", "hotspot_x",
    "hotspot_y" and "picture" of what it looks like, "opacity", "buttons" and "modifiers" (names with "+" between two, such
    as "shift+ctrl"), "window_x" to "window_height", "title", "application", "slide_title", "slide_text", "slide_comment",
    "hover_x" to "hover_height", "region_x" to "region_height", "scale" and "cpu". A number that is not known is not a
@@ -110,11 +104,13 @@ ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys)
    otherwise it moves between two entries, but rests while nothing was recorded. */
 ZulmEntries* zulm_states(ZulmRecording* recording, const double* times, size_t count, int32_t interpolates);
 
-/* What follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path" or "camera".
-   `parameters` is null or a list such as "least=3,untitled=1". */
+/* Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path" or "camera".
+   `parameters` is null or a list such as "least=3". The captions have one row for each key: "label" is its text, with a
+   bullet in place of what was typed unless "shows_keys=1"; "is_typed" is 1 if it makes words with its neighbours;
+   "first" is the row that begins its caption, and "end" the time until which the caption is shown. */
 ZulmEntries* zulm_insight(ZulmRecording* recording, const char* name, const char* parameters);
 
-/* The streams for a movie that was cut by an edit list, which is a JSON document: one row for each, with "kind" and all
+/* Returns the streams for a movie that was cut by an edit list, which is a JSON document: one row for each, with "kind" and all
    its "bytes". "is_copied" is 1 if the bytes are those of the recording; otherwise "moved", "carried", "added" and
    "left_out" count its entries. */
 ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits);

@@ -126,7 +126,7 @@ struct InsightTable {
 
     const char* name;
     std::vector<Parameter> parameters;
-    Table (*rows)(const Insights&, double rate);
+    Table (*rows)(const InsightSources&, const InsightOptions&, double rate);
 };
 
 /// Returns a function that sets a member of some of the options.
@@ -158,8 +158,21 @@ double yOf(const std::optional<Point>& point) {
     return memberOf(point, &Point::y);
 }
 
-Table clickRows(const Insights& insights, double) {
-    const std::vector<Click>& clicks = insights.clicks;
+std::vector<Click> clicksIn(const InsightSources& sources, const InsightOptions& options) {
+    return clicksOf(sources.actions, sources.positions, sources.duration, options.clicks);
+}
+
+CursorPath pathIn(const InsightSources& sources, const InsightOptions& options) {
+    return {sources.positions, clicksIn(sources, options), options.path};
+}
+
+std::vector<Zoom> zoomsIn(const InsightSources& sources, const InsightOptions& options) {
+    return zoomsOf(clicksIn(sources, options), sources.keys, sources.positions, sources.windows, sources.screen,
+                   sources.duration, options.zooms);
+}
+
+Table clickRows(const InsightSources& sources, const InsightOptions& options, double) {
+    const std::vector<Click> clicks = clicksIn(sources, options);
     Table table{startsOf(clicks), {}};
     table.add("end", clicks, [](const Click& click) { return click.end; });
     table.add("button", clicks, [](const Click& click) { return Text(nameOf(click.button)); });
@@ -175,7 +188,8 @@ Table clickRows(const Insights& insights, double) {
 }
 
 /// One row for each key, because captions grow while they are shown.
-Table captionRows(const Insights& insights, double) {
+Table captionRows(const InsightSources& sources, const InsightOptions& options, double) {
+    const std::vector<KeyCaption> captions = keyCaptions(sources.keys, options.captions);
     struct Row {
         const KeyCaption* caption;
         const CaptionKey* key;
@@ -183,7 +197,7 @@ Table captionRows(const Insights& insights, double) {
     };
     std::vector<Row> rows;
     Table table;
-    for (const KeyCaption& caption : insights.captions) {
+    for (const KeyCaption& caption : captions) {
         const auto first = static_cast<std::int32_t>(rows.size());
         for (const CaptionKey& key : caption.keys) {
             rows.push_back({&caption, &key, first});
@@ -197,14 +211,17 @@ Table captionRows(const Insights& insights, double) {
     return table;
 }
 
-Table idleRows(const Insights& insights, double) {
-    Table table{startsOf(insights.idle), {}};
-    table.add("end", insights.idle, [](const IdleSpan& span) { return span.end; });
+Table idleRows(const InsightSources& sources, const InsightOptions& options, double) {
+    const std::vector<IdleSpan> spans = idleSpansOf(sources.positions, sources.actions, sources.keys, sources.scrolling,
+                                                    sources.duration, options.idle);
+    Table table{startsOf(spans), {}};
+    table.add("end", spans, [](const IdleSpan& span) { return span.end; });
     return table;
 }
 
-Table chapterRows(const Insights& insights, double) {
-    const std::vector<Chapter>& chapters = insights.chapters;
+Table chapterRows(const InsightSources& sources, const InsightOptions& options, double) {
+    const std::vector<Chapter> chapters =
+        chaptersOf(sources.titles, sources.applications, sources.slides, sources.duration, options.chapters);
     Table table{startsOf(chapters), {}};
     table.add("end", chapters, [](const Chapter& chapter) { return chapter.end; });
     table.add("title", chapters, [](const Chapter& chapter) { return Text(chapter.title); });
@@ -213,14 +230,15 @@ Table chapterRows(const Insights& insights, double) {
 }
 
 /// One row for each place of a zoom.
-Table zoomRows(const Insights& insights, double) {
+Table zoomRows(const InsightSources& sources, const InsightOptions& options, double) {
+    const std::vector<Zoom> zooms = zoomsIn(sources, options);
     struct Row {
         const Zoom* zoom;
         const ZoomPlace* place;
     };
     std::vector<Row> rows;
     Table table;
-    for (const Zoom& zoom : insights.zooms)
+    for (const Zoom& zoom : zooms)
         for (const ZoomPlace& place : zoom.places) {
             rows.push_back({&zoom, &place});
             table.times.push_back(place.start);
@@ -247,22 +265,23 @@ std::vector<double> timesAt(double rate, double duration) {
     return times;
 }
 
-Table pathRows(const Insights& insights, double rate) {
-    const CursorPath& path = insights.path;
+Table pathRows(const InsightSources& sources, const InsightOptions& options, double rate) {
+    const CursorPath path = pathIn(sources, options);
     if (path.empty())
         return {};
-    Table table{timesAt(rate, insights.duration), {}};
+    Table table{timesAt(rate, sources.duration), {}};
     const auto placeAt = [&path](double time) { return path.at(time).value_or(ScreenPoint()); };
     table.add("x", table.times, [&](double time) { return placeAt(time).x; });
     table.add("y", table.times, [&](double time) { return placeAt(time).y; });
     return table;
 }
 
-Table cameraRows(const Insights& insights, double rate) {
-    Table table{timesAt(rate, insights.duration), {}};
+Table cameraRows(const InsightSources& sources, const InsightOptions& options, double rate) {
+    const Camera camera(zoomsIn(sources, options), pathIn(sources, options), sources.screen, options.camera);
+    Table table{timesAt(rate, sources.duration), {}};
     std::vector<CameraView> views;
     for (const double time : table.times)
-        views.push_back(insights.camera.at(time));
+        views.push_back(camera.at(time));
     table.add("zoom", views, [](const CameraView& view) { return view.zoom; });
     table.add("x", views, [](const CameraView& view) { return view.area.x; });
     table.add("y", views, [](const CameraView& view) { return view.area.y; });
@@ -366,7 +385,7 @@ Table insightTable(const Recording& recording, std::string_view name, const Insi
         if (name == table.name) {
             InsightOptions options;
             const double rate = applyParameters(table, parameters, options);
-            return table.rows(insightsOf(recording, options), rate);
+            return table.rows(insightSourcesOf(recording, [](const Error&) {}), options, rate);
         }
     throw std::invalid_argument("there are no insights " + std::string(name));
 }

@@ -881,6 +881,20 @@ TEST_F(SessionRemains, CanBeSavedAndRemoved) {
     EXPECT_THAT(filesInFolder(), ElementsAre("movie.mp4"));
 }
 
+TEST_F(SessionRemains, CanBeSavedAgain) {
+    {
+        SessionWriter session(path);
+        record(session);
+        EXPECT_EQ(refusal([&] { AbandonedSession opened(path); }),
+                  path.string() + ": is still in use; finish the recording first");
+    }
+    AbandonedSession(path).saveInto(newMovie("First.mp4"));
+    EXPECT_TRUE(found().empty());
+    EXPECT_EQ(AbandonedSession(path).saveInto(newMovie("Second.mp4")).streams.size(), 2U);
+    EXPECT_EQ(refusal([&] { AbandonedSession opened(folder / "missing"); }),
+              folder / "missing" + ": is no folder, so it holds no session");
+}
+
 /// A process that does something until it is killed.
 template <class Work>
 class Victim {

@@ -12,6 +12,7 @@ zulm_add_tests(ZULMetaDataSessionTests
   Insights/ClicksTest
   Insights/CursorPathTest
   Insights/IdleTest
+  Insights/InsightsTest
   Insights/KeyCaptionsTest
   Insights/ZoomsTest
   PictureTest

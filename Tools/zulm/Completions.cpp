@@ -31,7 +31,7 @@ bool isFolder(const ManualOption& option) {
 
 bool isFile(const ManualOption& option) {
     return option.isPositional || option.value == "FILE" || option.value == "MOVIE" || option.value == "OUT" ||
-           option.value == "OLDMOVIE";
+           option.value == "OLDMOVIE" || option.value == "EDITED";
 }
 
 /// In single quotes of a shell.

@@ -95,7 +95,8 @@ void addEditOptions(CLI::App& command, EditOptions& options) {
 }
 
 void requireEdits(const EditOptions& options) {
-    const int given = (options.file.empty() ? 0 : 1) + (options.kept.empty() ? 0 : 1) + (options.removed.empty() ? 0 : 1);
+    const int given =
+        (options.file.empty() ? 0 : 1) + (options.kept.empty() ? 0 : 1) + (options.removed.empty() ? 0 : 1);
     if (given == 0)
         throw CLI::RequiredError("either --edits FILE, --keep A-B or --remove A-B");
     if (given > 1)

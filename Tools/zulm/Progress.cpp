@@ -20,8 +20,8 @@ constexpr auto s_interval = 100ms;
 
 } // namespace
 
-Progress::Progress(std::string what, std::uint64_t totalBytes)
-    : what_(std::move(what)), total_(totalBytes),
+Progress::Progress(std::string what, std::uint64_t total, std::string (*text)(std::uint64_t))
+    : what_(std::move(what)), total_(total), text_(text),
       isEnabled_(!settings().quiet && !settings().noProgress && isTerminal(stderr)), next_(start_ + s_firstAfter) {}
 
 Progress::~Progress() {
@@ -43,11 +43,15 @@ void Progress::show(Clock::time_point now) {
     const double share = total_ == 0 ? 1 : static_cast<double>(done_) / static_cast<double>(total_);
     const double left = share > 0 ? elapsed / share - elapsed : 0;
     const std::string line = fmt::format("\r\033[K{}: {} of {} ({:.0f} %), {:.0f} s left", shownMessage(what_),
-                                         bytesText(done_), bytesText(total_), share * 100, left);
+                                         text_(done_), text_(total_), share * 100, left);
     std::fputs(line.c_str(), stderr); // a terminal that is gone must not end the work
     std::fflush(stderr);
     isShown_ = true;
     next_ = now + s_interval;
+}
+
+std::string secondsText(std::uint64_t milliseconds) {
+    return fmt::format("{:.0f} s", static_cast<double>(milliseconds) / 1000);
 }
 
 std::string bytesText(std::uint64_t bytes) {

@@ -6,10 +6,17 @@
 
 namespace Zulm {
 
-/// A line on standard error with bytes done and time left, once work has taken half a second; only on a terminal.
+/// "1.5 GB" and so on.
+std::string bytesText(std::uint64_t bytes);
+
+/// "12 s" for so many milliseconds.
+std::string secondsText(std::uint64_t milliseconds);
+
+/// A line on standard error with what is done and the time left, once work has taken half a second; only on a terminal.
 class Progress {
 public:
-    Progress(std::string what, std::uint64_t totalBytes);
+    /// `text` says how much of the work a number is.
+    Progress(std::string what, std::uint64_t total, std::string (*text)(std::uint64_t) = bytesText);
     ~Progress();
     Progress(const Progress&) = delete;
     Progress& operator=(const Progress&) = delete;
@@ -24,14 +31,12 @@ private:
 
     std::string what_;
     std::uint64_t total_;
+    std::string (*text_)(std::uint64_t);
     std::uint64_t done_ = 0;
     bool isEnabled_;
     bool isShown_ = false;
     Clock::time_point start_ = Clock::now();
     Clock::time_point next_;
 };
-
-/// "1.5 GB" and so on.
-std::string bytesText(std::uint64_t bytes);
 
 } // namespace Zulm

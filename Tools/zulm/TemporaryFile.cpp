@@ -46,7 +46,7 @@ void remember(const std::string& path) {
         return;
     std::memcpy(slot->path.data(), path.c_str(), path.size() + 1);
     slot->isUsed = 1;
-    handleEndingSignals(removeTemporariesAndEnd);
+    removeTemporaryFilesOnSignals();
 }
 
 void forget(const std::string& path) {
@@ -77,6 +77,10 @@ TemporaryFile::~TemporaryFile() {
 void TemporaryFile::release() {
     isReleased_ = true;
     forget(path_);
+}
+
+void removeTemporaryFilesOnSignals() {
+    handleEndingSignals(removeTemporariesAndEnd);
 }
 
 void removeTemporaryFiles() noexcept {

@@ -25,6 +25,9 @@ private:
     bool isReleased_ = false;
 };
 
+/// From here on, signals that end the program remove all of them first.
+void removeTemporaryFilesOnSignals();
+
 /// All that there are, for when the program ends in the middle of something. Asks for no memory.
 void removeTemporaryFiles() noexcept;
 

@@ -1,5 +1,7 @@
 #include "ZULMetaDataSession/Insights/Camera.h"
 
+#include "ZULMetaDataSession/Insights/ScreenGeometry.h"
+
 #include <algorithm>
 #include <cstddef>
 #include <span>
@@ -32,10 +34,6 @@ double exponentialOfMinus(double x) {
     return result;
 }
 
-ScreenPoint middleOfScreen(const ScreenRect& screen) {
-    return {screen.x + screen.width / 2, screen.y + screen.height / 2};
-}
-
 /// Returns `place`, or the nearest place to it that is at most `distance` from `other`.
 double pulledTo(double other, double place, double distance) {
     return std::max(other - distance, std::min(place, other + distance));
@@ -57,7 +55,7 @@ public:
             if (options_.followsCursor)
                 follow(place, end, zoom.factor);
         }
-        pullTo(zoom.end, middleOfScreen(camera_.screen_), 1);
+        pullTo(zoom.end, detail::middleOf(camera_.screen_), 1);
     }
 
 private:
@@ -91,7 +89,7 @@ private:
     /// Returns where the camera is at a time that is not before the last pull.
     Pull reached(double time) const {
         if (camera_.pulls_.empty()) {
-            const ScreenPoint middle = middleOfScreen(camera_.screen_);
+            const ScreenPoint middle = detail::middleOf(camera_.screen_);
             return {time, {middle.x, 0, middle.x, 0}, {middle.y, 0, middle.y, 0}, {1, 0, 1, 0}};
         }
         const Pull& last = camera_.pulls_.back();
@@ -123,8 +121,7 @@ private:
                          double factor) const {
         const ScreenPoint near(pulledTo(cursor.x, target.x, area.width * options_.deadZone),
                                pulledTo(cursor.y, target.y, area.height * options_.deadZone));
-        const ScreenRect visible = zoomedArea(camera_.screen_, near, factor);
-        return {visible.x + visible.width / 2, visible.y + visible.height / 2};
+        return detail::middleOf(zoomedArea(camera_.screen_, near, factor));
     }
 
     Camera& camera_;
@@ -156,7 +153,7 @@ Camera::Pull Camera::after(const Pull& pull, double seconds) const {
 CameraView Camera::at(double time) const {
     const auto next = std::upper_bound(pulls_.begin(), pulls_.end(), time,
                                        [](double asked, const Pull& pull) { return asked < pull.time; });
-    ScreenPoint centre = middleOfScreen(screen_);
+    ScreenPoint centre = detail::middleOf(screen_);
     double zoom = 1;
     if (next != pulls_.begin()) {
         const Pull& last = *(next - 1);
@@ -165,7 +162,7 @@ CameraView Camera::at(double time) const {
         zoom = std::max(1.0, now.zoom.place);
     }
     const ScreenRect area = zoomedArea(screen_, centre, zoom);
-    return {middleOfScreen(area), zoom, area};
+    return {detail::middleOf(area), zoom, area};
 }
 
 } // namespace ZULMetaData

@@ -19,7 +19,7 @@ namespace ZULMetaData {
 struct CameraOptions {
     double settleTime = 0.6;   ///< seconds until 95 percent of the way to a new place is done; at least 0.001
     bool followsCursor = true; ///< whether the camera follows the cursor while it is zoomed in
-    double deadZone = 0.25;    ///< of the visible width and height: how far from the middle the cursor is not followed
+    double deadZone = 0.25;    ///< part of the visible size; a cursor nearer to the middle is not followed
 };
 
 /// What a camera shows at one time.

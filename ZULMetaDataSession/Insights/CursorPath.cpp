@@ -1,5 +1,7 @@
 #include "ZULMetaDataSession/Insights/CursorPath.h"
 
+#include "ZULMetaDataSession/Snapshot.h"
+
 #include <algorithm>
 #include <cmath>
 #include <cstddef>
@@ -13,7 +15,7 @@ namespace {
 
 constexpr double s_longestUsualDistance = 1;  ///< in seconds
 constexpr double s_longestStay = 60;          ///< in seconds, within a movement
-constexpr double s_samplesPerSecond = 120;    ///< of a movement that is smoothed
+constexpr double s_samplesPerSecond = 120;    ///< how many points of a movement are smoothed
 constexpr std::size_t s_samplesPerCorner = 4; ///< at most
 constexpr double s_lowestCutoff = 0.001;      ///< in Hz
 constexpr double s_twoPi = 6.283185307179586;
@@ -25,31 +27,17 @@ struct Corner {
     bool isPinned = false; ///< whether the path passes through it
 };
 
-bool areEqual(const ScreenPoint& left, const ScreenPoint& right) {
+bool areSamePoint(const ScreenPoint& left, const ScreenPoint& right) {
     return left.x == right.x && left.y == right.y;
 }
 
-ScreenPoint between(const ScreenPoint& from, const ScreenPoint& to, double part) {
+ScreenPoint pointBetween(const ScreenPoint& from, const ScreenPoint& to, double part) {
     return {from.x + (to.x - from.x) * part, from.y + (to.y - from.y) * part};
 }
 
 /// Returns the point on the other side of `centre`.
-ScreenPoint mirrored(const ScreenPoint& point, const ScreenPoint& centre) {
+ScreenPoint mirroredPoint(const ScreenPoint& point, const ScreenPoint& centre) {
     return {2 * centre.x - point.x, 2 * centre.y - point.y};
-}
-
-/// Returns the median of the times between two entries at different times.
-double usualDistanceOf(std::span<const double> times) {
-    std::vector<double> distances;
-    distances.reserve(times.size());
-    for (std::size_t i = 1; i < times.size(); ++i)
-        if (times[i] > times[i - 1])
-            distances.push_back(times[i] - times[i - 1]);
-    if (distances.empty())
-        return s_longestUsualDistance;
-    const auto middle = distances.begin() + static_cast<std::ptrdiff_t>(distances.size() / 2);
-    std::nth_element(distances.begin(), middle, distances.end());
-    return std::min(*middle, s_longestUsualDistance);
 }
 
 /// Returns the positions through which the path passes, ordered by their times, one for each time.
@@ -111,12 +99,12 @@ private:
 
     void runForward(std::vector<ScreenPoint>& samples) const {
         for (std::size_t i = 1; i < samples.size(); ++i)
-            samples[i] = between(samples[i - 1], samples[i], weights_[i]);
+            samples[i] = pointBetween(samples[i - 1], samples[i], weights_[i]);
     }
 
     void runBackward(std::vector<ScreenPoint>& samples) const {
         for (std::size_t i = samples.size() - 1; i > 0; --i)
-            samples[i - 1] = between(samples[i], samples[i - 1], weights_[i - 1]);
+            samples[i - 1] = pointBetween(samples[i], samples[i - 1], weights_[i - 1]);
     }
 
     /// Takes the mean of both orders, so that a path and its reverse are smoothed alike.
@@ -164,7 +152,7 @@ public:
         const ScreenPoint atStart = missing(points.front(), samples[margin]);
         const ScreenPoint atEnd = missing(points.back(), samples[margin + steps_]);
         for (std::size_t i = 1; i < steps_; ++i) {
-            const ScreenPoint add = between(atStart, atEnd, static_cast<double>(i) / static_cast<double>(steps_));
+            const ScreenPoint add = pointBetween(atStart, atEnd, static_cast<double>(i) / static_cast<double>(steps_));
             points[i] = {samples[margin + i].x + add.x, samples[margin + i].y + add.y};
         }
         return points;
@@ -188,8 +176,8 @@ private:
                 ++next;
             const Corner& from = corners_[next - 1];
             const Corner& to = corners_[next];
-            points[i] =
-                time < to.time ? between(from.point, to.point, (time - from.time) / (to.time - from.time)) : to.point;
+            points[i] = time < to.time ? pointBetween(from.point, to.point, (time - from.time) / (to.time - from.time))
+                                       : to.point;
         }
         points.front() = corners_.front().point;
         points.back() = corners_.back().point;
@@ -208,8 +196,8 @@ private:
         std::vector<ScreenPoint> samples(points.size() + 2 * margin);
         std::copy(points.begin(), points.end(), samples.begin() + static_cast<std::ptrdiff_t>(margin));
         for (std::size_t i = 1; i <= margin; ++i) {
-            samples[margin - i] = mirrored(points[i], points.front());
-            samples[margin + steps_ + i] = mirrored(points[steps_ - i], points.back());
+            samples[margin - i] = mirroredPoint(points[i], points.front());
+            samples[margin + steps_ + i] = mirroredPoint(points[steps_ - i], points.back());
         }
         return samples;
     }
@@ -226,7 +214,7 @@ public:
         : options_(options), usualDistance_(usualDistance), times_(times), points_(points) {}
 
     void add(const Corner& corner) {
-        if (!stay_.empty() && !areEqual(stay_.back().point, corner.point)) {
+        if (!stay_.empty() && !areSamePoint(stay_.back().point, corner.point)) {
             stayUntilTheMoveTo(corner);
             endStay();
         }
@@ -299,7 +287,7 @@ private:
 CursorPath::CursorPath(const Track<CursorLocationKind>& positions, const std::vector<Click>& clicks,
                        const CursorPathOptions& options) {
     const std::span<const double> times = positions.times();
-    PathMaker maker(options, usualDistanceOf(times), times_, points_);
+    PathMaker maker(options, std::min(usualDistance(times), s_longestUsualDistance), times_, points_);
     const std::vector<Corner> pins = pinsOf(clicks);
     auto pin = pins.begin();
     for (std::size_t i = 0; i < times.size(); ++i) {
@@ -325,9 +313,9 @@ std::optional<ScreenPoint> CursorPath::at(double time) const {
     if (next == 0 || next == times_.size())
         return next == 0 ? points_.front() : points_.back();
     const ScreenPoint& from = points_[next - 1];
-    if (areEqual(from, points_[next]))
+    if (areSamePoint(from, points_[next]))
         return from;
-    return between(from, points_[next], (time - times_[next - 1]) / (times_[next] - times_[next - 1]));
+    return pointBetween(from, points_[next], (time - times_[next - 1]) / (times_[next] - times_[next - 1]));
 }
 
 std::vector<ScreenPoint> CursorPath::resampled(double start, double rate, std::size_t count) const {

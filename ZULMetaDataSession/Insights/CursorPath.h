@@ -30,8 +30,8 @@ struct CursorPathOptions {
 /// every click at the time of its press, through the end of every drag, and stays where the cursor rests. Equal input
 /// makes an equal path on every machine, to the last bit.
 ///
-/// Between two entries the cursor moves in a straight line. If nothing is recorded for more than twice the usual
-/// distance between two entries (the median, at most 1 s), the cursor stays, and then moves within the usual distance.
+/// Before it is smoothed, the cursor moves as in `cursorPositionAt`: straight from entry to entry, but if nothing is
+/// recorded for more than twice the usual distance (at most 1 s), it stays, and then moves within that distance.
 class ZULMETADATA_API CursorPath {
 public:
     CursorPath() = default; ///< creates an empty path

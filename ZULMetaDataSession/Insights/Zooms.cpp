@@ -1,6 +1,7 @@
 #include "ZULMetaDataSession/Insights/Zooms.h"
 
 #include "ZULMetaDataSession/Insights/KeyCaptions.h"
+#include "ZULMetaDataSession/Insights/ScreenGeometry.h"
 
 #include <algorithm>
 #include <cmath>
@@ -10,17 +11,9 @@ namespace ZULMetaData {
 
 namespace {
 
-bool hasArea(const ScreenRect& rect) {
-    return rect.width > 0 && rect.height > 0;
-}
-
-bool contains(const ScreenRect& rect, const ScreenPoint& point) {
-    return point.x >= rect.x && point.x <= rect.x + rect.width && point.y >= rect.y && point.y <= rect.y + rect.height;
-}
-
-ScreenPoint middleOf(const ScreenRect& rect) {
-    return {rect.x + rect.width / 2, rect.y + rect.height / 2};
-}
+using detail::contains;
+using detail::hasArea;
+using detail::middleOf;
 
 /// Returns the part of both, which has no area if they do not meet.
 ScreenRect commonOf(const ScreenRect& left, const ScreenRect& right) {
@@ -143,11 +136,7 @@ private:
     /// Returns the part of the window on top that can be seen, without area if there is none.
     ScreenRect windowAt(double time) const {
         const Rect* window = windows_.at(time);
-        if (!window)
-            return {};
-        return commonOf({static_cast<double>(window->x), static_cast<double>(window->y),
-                         static_cast<double>(window->width), static_cast<double>(window->height)},
-                        screen_);
+        return window ? commonOf(detail::screenRect(*window), screen_) : ScreenRect();
     }
 
     const Track<CursorLocationKind>& positions_;

@@ -19,7 +19,7 @@ namespace ZULMetaData {
 /// What makes a zoom, and how long it lasts.
 struct ZoomOptions {
     double groupTime = 2.5;      ///< seconds from press to press, at most, in a group of clicks
-    double groupDistance = 0.15; ///< of the screen's width and height: how far a click is from its group, at most
+    double groupDistance = 0.15; ///< part of the screen's size from a click to the middle of its group, at most
     double typingGap = 1.5;      ///< seconds from key to key, at most, while somebody types
     std::size_t typingKeys = 3;  ///< keys, at least, that make a zoom
     double lead = 0.4;           ///< seconds from the start of a zoom to its first click or key

@@ -43,6 +43,7 @@ def cases(streams):
         Case("atoms", ["atoms", "Recording.mp4"], whole),
         Case("dump", ["dump", "Recording.mp4"], whole),
         Case("grep", ["grep", "e", "Recording.mp4"], whole),
+        Case("state", ["state", "Recording.mp4", "--at", "1"], whole),
         Case("diff", ["diff", "Recording.mp4", "Broken.mp4"], whole | damaged),
         Case("verify", ["verify", "Recording.mp4"], whole),
         Case("extract", ["extract", "Recording.mp4", "-o", "out"], whole),

@@ -32,7 +32,7 @@ Camera cameraOn(const std::vector<Zoom>& zooms, const CameraOptions& options = {
     return {zooms, s_noCursor, s_screen, options};
 }
 
-CursorPath pathOf(const Entries<CursorLocationKind>& entries) {
+CursorPath pathOf(const TrackEntries<CursorLocationKind>& entries) {
     return {positions(entries), {}};
 }
 
@@ -102,7 +102,7 @@ TEST(Camera, DoesNotSwingOver) {
 }
 
 TEST(Camera, MovesWithoutAJump) {
-    Entries<CursorLocationKind> entries;
+    TrackEntries<CursorLocationKind> entries;
     Numbers numbers(1);
     for (int i = 0; i <= 600; ++i)
         entries.push_back({i / 60.0, {numbers.below(3000), numbers.below(1500)}});
@@ -130,7 +130,7 @@ TEST(Camera, GoesFromPlaceToPlace) {
 }
 
 TEST(Camera, FollowsACursorThatLeavesTheMiddle) {
-    Entries<CursorLocationKind> entries{{0, {1200, 600}}};
+    TrackEntries<CursorLocationKind> entries{{0, {1200, 600}}};
     for (int i = 0; i <= 60; ++i)
         entries.push_back({15 + i / 60.0, {1200 + 10 * i, 600}}); // to 1800
     const CursorPath path = pathOf(entries);
@@ -162,7 +162,7 @@ TEST(Camera, LooksAtThePlaceUntilTheFirstClick) {
 }
 
 TEST(Camera, ShowsTheSameAtATimeWhateverWasAskedBefore) {
-    Entries<CursorLocationKind> entries;
+    TrackEntries<CursorLocationKind> entries;
     Numbers numbers(2);
     for (int i = 0; i <= 600; ++i)
         entries.push_back({i / 60.0, {numbers.below(3000), numbers.below(1500)}});
@@ -180,7 +180,7 @@ TEST(Camera, NeverLeavesThePicture) {
         const ScreenRect screen{static_cast<double>(numbers.below(1000)), static_cast<double>(numbers.below(1000)),
                                 static_cast<double>(1 + numbers.below(3000)),
                                 static_cast<double>(1 + numbers.below(3000))};
-        Entries<CursorLocationKind> entries;
+        TrackEntries<CursorLocationKind> entries;
         std::vector<Click> clicks;
         for (int i = 0; i < 300; ++i) {
             const Point point(numbers.below(5000) - 500, numbers.below(5000) - 500);
@@ -244,7 +244,7 @@ TEST(Camera, TakesZoomsInAnyOrder) {
 }
 
 TEST(Camera, IsTheSameOnEveryMachine) {
-    Entries<CursorLocationKind> entries;
+    TrackEntries<CursorLocationKind> entries;
     Numbers numbers(3);
     for (int i = 0; i <= 6000; ++i)
         entries.push_back({i / 64.0, {numbers.below(3000), numbers.below(1500)}});

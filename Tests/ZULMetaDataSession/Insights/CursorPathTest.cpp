@@ -38,15 +38,15 @@ Click clickAt(double time, const std::optional<Point>& position) {
     return click;
 }
 
-CursorPath pathOf(const Entries<CursorLocationKind>& entries, const std::vector<Click>& clicks = {},
+CursorPath pathOf(const TrackEntries<CursorLocationKind>& entries, const std::vector<Click>& clicks = {},
                   const CursorPathOptions& options = {}) {
     return {positions(entries), clicks, options};
 }
 
 /// Moves and rests that look like those of a person, 64 entries in a second.
-Entries<CursorLocationKind> wandering(std::uint64_t seed, int entries) {
+TrackEntries<CursorLocationKind> wandering(std::uint64_t seed, int entries) {
     Numbers numbers(seed);
-    Entries<CursorLocationKind> result;
+    TrackEntries<CursorLocationKind> result;
     int x = 500;
     int y = 500;
     for (int i = 0; i < entries; ++i) {
@@ -82,7 +82,7 @@ TEST(CursorPath, BeginsAndEndsWhereTheEntriesDo) {
 }
 
 TEST(CursorPath, LeavesAStraightMovementAlone) {
-    Entries<CursorLocationKind> entries;
+    TrackEntries<CursorLocationKind> entries;
     for (int i = 0; i <= 64; ++i)
         entries.push_back({i / 64.0, {10 * i, -5 * i}});
     const CursorPath path = pathOf(entries);
@@ -91,7 +91,7 @@ TEST(CursorPath, LeavesAStraightMovementAlone) {
 }
 
 TEST(CursorPath, TakesOutTremor) {
-    Entries<CursorLocationKind> entries;
+    TrackEntries<CursorLocationKind> entries;
     for (int i = 0; i <= 128; ++i)
         entries.push_back({i / 64.0, {4 * i, i % 2 == 0 ? 0 : 10}});
     const CursorPath path = pathOf(entries);
@@ -100,8 +100,9 @@ TEST(CursorPath, TakesOutTremor) {
 }
 
 TEST(CursorPath, StaysWhereTheCursorRests) {
-    const Entries<CursorLocationKind> entries{{0, {0, 0}},       {0.02, {30, 10}}, {0.04, {70, 40}}, {0.06, {100, 50}},
-                                              {1.06, {100, 50}}, {1.08, {90, 80}}, {1.1, {30, 90}}};
+    const TrackEntries<CursorLocationKind> entries{{0, {0, 0}},       {0.02, {30, 10}},  {0.04, {70, 40}},
+                                                   {0.06, {100, 50}}, {1.06, {100, 50}}, {1.08, {90, 80}},
+                                                   {1.1, {30, 90}}};
     const CursorPath path = pathOf(entries);
     for (const double time : {0.06, 0.060001, 0.5, 1.059999, 1.06})
         expectPoint(path.at(time), 100, 50);
@@ -118,7 +119,7 @@ TEST(CursorPath, RestsWhileNothingIsRecorded) {
 }
 
 TEST(CursorPath, RestsOnlyWhereTheCursorStaysLongEnough) {
-    Entries<CursorLocationKind> entries;
+    TrackEntries<CursorLocationKind> entries;
     for (int i = 0; i <= 10; ++i)
         entries.push_back({i / 50.0, {5 * i, i * i}});
     for (int i = 0; i <= 10; ++i)
@@ -136,7 +137,7 @@ TEST(CursorPath, RestsOnlyWhereTheCursorStaysLongEnough) {
 
 TEST(CursorPath, PassesThroughEveryClick) {
     for (std::uint64_t seed = 0; seed < 50; ++seed) {
-        const Entries<CursorLocationKind> entries = wandering(seed, 2000);
+        const TrackEntries<CursorLocationKind> entries = wandering(seed, 2000);
         const Track<CursorLocationKind> track = positions(entries);
         Numbers numbers(seed);
         std::vector<Click> clicks;
@@ -152,7 +153,7 @@ TEST(CursorPath, PassesThroughEveryClick) {
 }
 
 TEST(CursorPath, PassesThroughTheEndOfADrag) {
-    Entries<CursorLocationKind> entries;
+    TrackEntries<CursorLocationKind> entries;
     for (int i = 0; i <= 64; ++i)
         entries.push_back({i / 64.0, {i * i, 0}});
     Click drag = clickAt(0.25, Point(256, 0));
@@ -173,7 +174,7 @@ TEST(CursorPath, PassesThroughTheLastOfSeveralClicksAtOneTime) {
 }
 
 TEST(CursorPath, LeavesACornerAsItReachesIt) {
-    Entries<CursorLocationKind> entries; // to the right, and back the same way
+    TrackEntries<CursorLocationKind> entries; // to the right, and back the same way
     for (int i = 0; i <= 128; ++i)
         entries.push_back({i / 64.0, {i <= 64 ? 10 * i : 10 * (128 - i), i <= 64 ? i * i : (128 - i) * (128 - i)}});
     const CursorPath path = pathOf(entries, {clickAt(0.5, Point(320, 1024)), clickAt(1.5, Point(320, 1024))});
@@ -186,8 +187,8 @@ TEST(CursorPath, LeavesACornerAsItReachesIt) {
 TEST(CursorPath, OfTheReverseIsTheReverse) {
     for (std::uint64_t seed = 0; seed < 20; ++seed) {
         Numbers numbers(seed);
-        Entries<CursorLocationKind> entries;
-        Entries<CursorLocationKind> reversed;
+        TrackEntries<CursorLocationKind> entries;
+        TrackEntries<CursorLocationKind> reversed;
         for (int i = 0; i <= 256; ++i) {
             const Point point(numbers.below(500), numbers.below(500));
             entries.push_back({i / 64.0, point});
@@ -204,7 +205,7 @@ TEST(CursorPath, OfTheReverseIsTheReverse) {
 
 /// Returns how far the middle of a hill of `height` pixels remains.
 double hillAfter(const CursorPathOptions& options, int height = 400) {
-    Entries<CursorLocationKind> entries;
+    TrackEntries<CursorLocationKind> entries;
     for (int i = 0; i <= 128; ++i)
         entries.push_back({i / 64.0, {i, height - std::abs(i - 64) * height / 64}});
     return pathOf(entries, {}, options).at(1)->y;
@@ -282,7 +283,7 @@ TEST(CursorPath, StaysFiniteForOddNumbers) {
 }
 
 TEST(CursorPath, HasFewCornersHoweverFarApartTheEntriesAre) {
-    Entries<CursorLocationKind> entries;
+    TrackEntries<CursorLocationKind> entries;
     for (int i = 0; i < 1000; ++i)
         entries.push_back({i * 1e9, {i, i * i % 100}});
     EXPECT_LE(pathOf(entries).times().size(), 2000U);

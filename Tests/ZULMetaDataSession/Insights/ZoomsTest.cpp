@@ -42,8 +42,8 @@ std::vector<std::pair<double, KeyStroke>> typedAt(const std::vector<double>& tim
 struct Session {
     std::vector<Click> clicks = {};
     std::vector<std::pair<double, KeyStroke>> keys = {};
-    Entries<CursorLocationKind> cursor = {};
-    Entries<TopmostWindowKind> windows = {};
+    TrackEntries<CursorLocationKind> cursor = {};
+    TrackEntries<TopmostWindowKind> windows = {};
     ScreenRect screen = s_screen;
     double duration = 100;
 
@@ -278,7 +278,7 @@ TEST(Zooms, DoNotTakeShortcutsAndSpecialKeysForTyping) {
 }
 
 TEST(Zooms, OfTypingGoToTheWindowIfTheCursorIsElsewhere) {
-    const auto centresFor = [](const Entries<CursorLocationKind>& cursor, const Rect& window) {
+    const auto centresFor = [](const TrackEntries<CursorLocationKind>& cursor, const Rect& window) {
         const std::vector<Zoom> zooms =
             Session{.keys = typedAt({10, 10.2, 10.4}), .cursor = cursor, .windows = {{0, window}}}.zooms();
         return zooms.empty() ? std::vector<std::pair<double, double>>() : centresOf(zooms[0]);
