@@ -83,7 +83,7 @@ EditRange parseEditRange(std::string_view text) {
     const auto end = mark == std::string_view::npos ? std::nullopt : parseEditTime(text.substr(mark + 1));
     if (!start || !end)
         refuse('"' + std::string(text) + "\" is no range; write two times such as 10-12.5, 61/3-25 or 0:10-1:30");
-    const EditRange range{*start, *end};
+    EditRange range{*start, *end};
     requireOrder(range);
     return range;
 }

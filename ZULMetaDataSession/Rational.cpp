@@ -189,11 +189,12 @@ struct Rational::Arithmetic {
                                     : std::strong_ordering::equal;
         }
         if (left.isNegative() != right.isNegative())
-            return right.isNegative() <=> left.isNegative();
+            return left.isNegative() ? std::strong_ordering::less : std::strong_ordering::greater;
         const Magnitudes a(left);
         const Magnitudes b(right);
-        const auto order = a->numerator * b->denominator <=> b->numerator * a->denominator;
-        return left.isNegative() ? 0 <=> order : order;
+        const Natural first = a->numerator * b->denominator;
+        const Natural second = b->numerator * a->denominator;
+        return left.isNegative() ? second <=> first : first <=> second;
     }
 
     static double magnitude(std::uint64_t numerator, std::uint64_t denominator) {
@@ -204,6 +205,7 @@ struct Rational::Arithmetic {
                                    static_cast<std::size_t>(std::bit_width(denominator)));
         const UnsignedWide over = UnsignedWide{numerator} << std::max(shift, 0);
         const UnsignedWide under = UnsignedWide{denominator} << std::max(-shift, 0);
+        assert(under != 0);
         return rounded(static_cast<std::uint64_t>(over / under), over % under == 0, -shift);
     }
 
