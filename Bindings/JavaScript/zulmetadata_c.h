@@ -96,23 +96,23 @@ typedef struct {
 ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind);
 ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index);
 
-/* Returns what holds at each of these times, in seconds. The columns are "x" and "y" of the cursor, "cursor_id", "hotspot_x",
-   "hotspot_y" and "picture" of what it looks like, "opacity", "buttons" and "modifiers" (names with "+" between two, such
-   as "shift+ctrl"), "window_x" to "window_height", "title", "application", "slide_title", "slide_text", "slide_comment",
-   "hover_x" to "hover_height", "region_x" to "region_height", "scale" and "cpu". A number that is not known is not a
-   number, a text that is not known is ZulmNothing. If `interpolates` is 0, the cursor is where the last entry says;
-   otherwise it moves between two entries, but rests while nothing was recorded. */
+/* Returns what holds at each of these times, in seconds. The columns are "x" and "y" of the cursor, "cursor_id",
+   "hotspot_x", "hotspot_y" and "picture" of what it looks like, "opacity", "buttons" and "modifiers" (names with "+"
+   between two, such as "shift+ctrl"), "window_x" to "window_height", "title", "application", "slide_title",
+   "slide_text", "slide_comment", "hover_x" to "hover_height", "region_x" to "region_height", "scale" and "cpu". A
+   number that is not known is not a number, a text that is not known is ZulmNothing. If `interpolates` is 0, the cursor
+   is where the last entry says; otherwise it moves between two entries, but rests while nothing was recorded. */
 ZulmEntries* zulm_states(ZulmRecording* recording, const double* times, size_t count, int32_t interpolates);
 
-/* Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path" or "camera".
-   `parameters` is null or a list such as "least=3". The captions have one row for each key: "label" is its text, with a
-   bullet in place of what was typed unless "shows_keys=1"; "is_typed" is 1 if it makes words with its neighbours;
-   "first" is the row that begins its caption, and "end" the time until which the caption is shown. */
+/* Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path" or
+   "camera". `parameters` is null or a list such as "least=3". The captions have one row for each key: "label" is its
+   text, with a bullet in place of what was typed unless "shows_keys=1"; "is_typed" is 1 if it makes words with its
+   neighbours; "first" is the row that begins its caption, and "end" the time until which the caption is shown. */
 ZulmEntries* zulm_insight(ZulmRecording* recording, const char* name, const char* parameters);
 
-/* Returns the streams for a movie that was cut by an edit list, which is a JSON document: one row for each, with "kind" and all
-   its "bytes". "is_copied" is 1 if the bytes are those of the recording; otherwise "moved", "carried", "added" and
-   "left_out" count its entries. */
+/* Returns the streams for a movie that was cut by an edit list, which is a JSON document: one row for each, with "kind"
+   and all its "bytes". "is_copied" is 1 if the bytes are those of the recording; otherwise "moved", "carried", "added"
+   and "left_out" count its entries. */
 ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits);
 
 void zulm_free_entries(ZulmEntries* entries);

@@ -1,5 +1,5 @@
-// Prints what the session layer computes from a recording, as the C++ library says it. The tests of the bindings compare
-// their own numbers with it: session_numbers RECORDING EDITS
+// Prints what the session layer computes from a recording, as the C++ library says it. The tests of the bindings
+// compare their own numbers with it: session_numbers RECORDING EDITS
 
 #include "Bindings/Tables/SessionTables.h"
 #include "Reports/Text.h"
