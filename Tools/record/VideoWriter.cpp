@@ -96,8 +96,8 @@ void VideoWriter::requireCodec(const std::string& name) {
 }
 
 VideoWriter::VideoWriter(const std::filesystem::path& file, const VideoSettings& settings, std::function<bool()> onFull)
-    : path_(file), settings_(settings), onFull_(std::move(onFull)), output_(std::make_unique<Output>()) {
-    file_ = FileHandle(open(file.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
+    : path_(file), settings_(settings), onFull_(std::move(onFull)),
+      file_(open(file.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0600)), output_(std::make_unique<Output>()) {
     if (!file_)
         throw Failure(fmt::format("{}: cannot be created: {}", file.string(), std::strerror(errno)));
     openFile();
