@@ -149,8 +149,10 @@ bool Camera::waitForTick() {
 
 void Camera::serveTick() {
     bool isFull = false;
+    Instant due = 0;
     {
         const std::lock_guard lock(mutex_);
+        due = nextTick_;
         isFull = queue_.size() >= s_queuedPictures;
     }
     const std::optional<GrabbedPicture> grabbed = isFull ? grabber_.askPointer() : grabber_.grab();
@@ -160,7 +162,7 @@ void Camera::serveTick() {
     if (grabbed && grabbed->hasPointer)
         events_.sawPointer(grabbed->pointerInstant, grabbed->pointer);
     if (!time) {
-        countDropped(grabbed ? grabbed->instant : now());
+        countDropped(due); // even if the end has come before its pixels
         return;
     }
     Picture picture{converted(*grabbed), *time};
@@ -171,9 +173,9 @@ void Camera::serveTick() {
 }
 
 /// Counts a tick without a frame, if it is one of the recording.
-void Camera::countDropped(Instant instant) {
+void Camera::countDropped(Instant due) {
     const std::lock_guard lock(mutex_);
-    const bool isAfter = (stopAt_ && instant >= *stopAt_) || (pausedAt_ && instant >= *pausedAt_);
+    const bool isAfter = (stopAt_ && due >= *stopAt_) || (pausedAt_ && due >= *pausedAt_);
     if (zero_ && !isAfter)
         ++dropped_;
 }

@@ -65,7 +65,7 @@ private:
     void takePictures();
     void encodePictures();
     void serveTick();
-    void countDropped(Instant instant);
+    void countDropped(Instant due);
     bool waitForTick();
     void skipMissedTicks();
     void countTicksFrom(Instant instant);

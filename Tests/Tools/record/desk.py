@@ -69,7 +69,7 @@ class Desk:
         return self.run("xdotool", *[str(word) for word in words])
 
     @staticmethod
-    def wait_for(holds, seconds=15):
+    def wait_for(holds, seconds=60):
         until = time.monotonic() + seconds
         while not holds():
             if time.monotonic() > until:
