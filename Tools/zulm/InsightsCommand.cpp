@@ -144,7 +144,7 @@ std::string chapterText(const Chapter& chapter) {
 std::string zoomText(const Zoom& zoom) {
     std::string text = fmt::format("{:g} times", zoom.factor);
     for (const ZoomPlace& place : zoom.places)
-        text += fmt::format("{} {} at {:.0f},{:.0f}", &place == &zoom.places.front() ? ":" : ", then",
+        text += fmt::format("{} {} around {:.0f},{:.0f}", &place == &zoom.places.front() ? ":" : ", then",
                             reasonText(place.reason), place.centre.x, place.centre.y);
     return text;
 }
