@@ -57,7 +57,7 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         commands.push_back(name.substr(5));
     }
     EXPECT_THAT(commands,
-                testing::UnorderedElementsAre("atoms", "attach", "compact", "cut", "detach", "diff", "dump",
+                testing::UnorderedElementsAre("atoms", "attach", "compact", "cut", "detach", "diff", "dump", "edits",
                                               "extract", "grep", "info", "insights", "record", "redact", "repair",
                                               "retime", "salvage", "stamp", "state", "verify", "view"));
 }
