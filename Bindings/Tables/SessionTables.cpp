@@ -145,6 +145,7 @@ void setOption(InsightOptions& options, double value) {
 template <class Rows>
 std::vector<double> startsOf(const Rows& rows) {
     std::vector<double> starts;
+    starts.reserve(rows.size());
     for (const auto& row : rows)
         starts.push_back(row.start);
     return starts;
@@ -280,6 +281,7 @@ Table cameraRows(const InsightSources& sources, const InsightOptions& options, d
     const Camera camera(zoomsIn(sources, options), pathIn(sources, options), sources.screen, options.camera);
     Table table{timesAt(rate, sources.duration), {}};
     std::vector<CameraView> views;
+    views.reserve(table.times.size());
     for (const double time : table.times)
         views.push_back(camera.at(time));
     table.add("zoom", views, [](const CameraView& view) { return view.zoom; });
@@ -375,6 +377,7 @@ Table statesTable(const Recording& recording, std::span<const double> times, Int
 
 std::vector<const char*> insightNames() {
     std::vector<const char*> names;
+    names.reserve(insightTables().size());
     for (const InsightTable& table : insightTables())
         names.push_back(table.name);
     return names;

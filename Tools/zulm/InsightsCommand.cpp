@@ -190,7 +190,7 @@ public:
             if (isDecodable(file_.examine(stream).header()))
                 note(complainAboutRest(file_, stream, file_.examine(stream).readableBytes));
         const Recording recording(file_.bytes(), file_.name());
-        const InsightSources sources = insightSourcesOf(recording, [this](const Error& error) {
+        InsightSources sources = insightSourcesOf(recording, [this](const Error& error) {
             complain(error.what());
             note(ExitDamaged);
         });
