@@ -138,6 +138,7 @@ TEST(EditList, ReadsNumbersAndTexts) {
                 ElementsAre("0-3602879701896397/36028797018963968@1=3602879701896397/36028797018963968"));
     EXPECT_THAT(textsOf(listOf(R"({"start": 0, "end": "0.1"})")), ElementsAre("0-1/10@1=1/10"));
     EXPECT_THAT(textsOf(listOf(R"({"start": -0, "end": 1E0})")), ElementsAre("0-1@1=1"));
+    EXPECT_THAT(textsOf(listOf(R"({"start": 0.0e999, "end": 10e-1})")), ElementsAre("0-1@1=1"));
     EXPECT_THAT(textsOf(EditList::read(
                     " \n{\"pieces\" : [ ],\t\"schema_version\": 1.0, \"schema\":\"zulm.e\\u0064its\"}\r\n", "a.json")),
                 IsEmpty());

@@ -92,7 +92,7 @@ std::optional<Rational> exactDecimal(std::string_view number) {
 std::optional<Rational> nearestDouble(std::string_view number) {
     constexpr std::size_t mostTelling = 800; // two doubles, and what lies half-way between them, differ earlier
     Decimal decimal = decimalOf(number);
-    if (decimal.places() < -s_mostPlaces)
+    if (decimal.digits.empty() || decimal.places() < -s_mostPlaces)
         return Rational();
     if (decimal.places() > s_mostPlaces)
         return std::nullopt;
