@@ -143,7 +143,7 @@ CaptureTarget windowTarget(XConnection& connection, const std::string& name) {
     target.area = evenSides(target.area);
     if (hasComposite && target.area.width >= 2 && target.area.height >= 2) {
         const auto cookie = xcb_composite_query_version(connection.get(), 0, 4);
-        Reply<xcb_composite_query_version_reply_t>(
+        const Reply<xcb_composite_query_version_reply_t> version(
             xcb_composite_query_version_reply(connection.get(), cookie, nullptr));
         target.window = connection.topLevelOf(window);
         if (target.window != window) { // in a frame, of which the recording then shows all

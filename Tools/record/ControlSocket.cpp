@@ -36,7 +36,7 @@ constexpr std::array s_words{Word{Command::Pause, "pause"}, Word{Command::Resume
 fs::path runtimeFolder() {
     if (const char* folder = std::getenv("XDG_RUNTIME_DIR"); folder && *folder)
         return folder;
-    const fs::path usual = fmt::format("/run/user/{}", getuid());
+    fs::path usual = fmt::format("/run/user/{}", getuid());
     std::error_code error;
     if (fs::is_directory(usual, error))
         return usual;

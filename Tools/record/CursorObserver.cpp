@@ -41,7 +41,8 @@ CursorObserver::CursorObserver(XConnection& connection, const ServerClock& clock
         throw Refusal("the X display has no XFixes extension, without which the cursor cannot be recorded");
     firstEvent_ = xcb_get_extension_data(connection_.get(), &xcb_xfixes_id)->first_event;
     const auto cookie = xcb_xfixes_query_version(connection_.get(), 4, 0);
-    Reply<xcb_xfixes_query_version_reply_t>(xcb_xfixes_query_version_reply(connection_.get(), cookie, nullptr));
+    const Reply<xcb_xfixes_query_version_reply_t> version(
+        xcb_xfixes_query_version_reply(connection_.get(), cookie, nullptr));
     xcb_xfixes_select_cursor_input(connection_.get(), connection_.root(), XCB_XFIXES_CURSOR_NOTIFY_MASK_DISPLAY_CURSOR);
     ask(now());
 }

@@ -13,7 +13,7 @@ constexpr std::chrono::milliseconds s_flushInterval(150);
 
 } // namespace
 
-Journal::Journal(const std::filesystem::path& folder, std::function<void()> onLoss)
+Journal::Journal(const std::filesystem::path& folder, const std::function<void()>& onLoss)
     : session_(folder, SessionOptions{s_flushInterval, [onLoss](const Error&) { onLoss(); }, {}}) {}
 
 template <class Kind>

@@ -29,7 +29,7 @@ using Noted = std::conditional_t<std::is_same_v<Kind, ZULMetaData::CursorImageKi
 /// Writes observations, which have instants, as entries, which have times. One thread uses it.
 class Journal {
 public:
-    Journal(const std::filesystem::path& folder, std::function<void()> onLoss);
+    Journal(const std::filesystem::path& folder, const std::function<void()>& onLoss);
 
     /// Notes an observation. A state that holds already is not written again.
     template <class Kind>

@@ -3,7 +3,8 @@
 #include "Tools/record/Failure.h"
 #include "Tools/record/VirtualKeys.h"
 
-#define explicit explicit_ // a field of the extension's header has a name that C++ reserves
+// A field of the extension's header has a name that C++ reserves.
+#define explicit explicit_ // NOLINT(clang-diagnostic-keyword-macro)
 #include <xcb/xkb.h>
 #undef explicit
 #include <xkbcommon/xkbcommon-x11.h>

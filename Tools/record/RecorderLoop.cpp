@@ -136,7 +136,8 @@ void RecorderLoop::selectInput() {
     if (!connection_.has(xcb_input_id))
         throw Refusal("the X display has no XInput extension, without which clicks and keys cannot be recorded");
     const auto cookie = xcb_input_xi_query_version(connection_.get(), 2, 1);
-    Reply<xcb_input_xi_query_version_reply_t>(xcb_input_xi_query_version_reply(connection_.get(), cookie, nullptr));
+    const Reply<xcb_input_xi_query_version_reply_t> version(
+        xcb_input_xi_query_version_reply(connection_.get(), cookie, nullptr));
     struct {
         xcb_input_event_mask_t head;
         std::uint32_t events;
