@@ -13,11 +13,12 @@ entries. Open the file again after it changes. A problem with a file raises an `
 
 from __future__ import annotations
 
+import importlib
 import json
 import os
 from collections.abc import Iterable, Iterator, Mapping
 from types import TracebackType
-from typing import TYPE_CHECKING, Any, Literal, Union, cast
+from typing import Any, Literal, Union, cast
 
 import numpy as np
 import numpy.typing as npt
@@ -47,9 +48,6 @@ from ._entries import Records as _Records
 from ._entries import records_of as _records_of
 from ._kinds import Kind
 from ._tables import table_of as _table_of
-
-if TYPE_CHECKING:
-    import pandas
 
 __all__ = [
     "Attached",
@@ -206,11 +204,10 @@ class Recording(Mapping[Kind, _Records]):
         return type(self), (os.path.abspath(os.fspath(self.path)),)
 
 
-def to_pandas(records: _Records) -> pandas.DataFrame:
-    """Returns records as a data frame of pandas, with the time in seconds as its index if they have one. Raises an
+def to_pandas(records: _Records) -> Any:
+    """Returns records as a `pandas.DataFrame`, with the time in seconds as its index if they have one. Raises an
     `ImportError` if pandas is not installed."""
-    import pandas
-
+    pandas = importlib.import_module("pandas")
     frame = pandas.DataFrame({name: records[name] for name in records.dtype.names or ()})
     return frame.set_index("time") if "time" in frame else frame
 
