@@ -36,7 +36,8 @@ CHECKS = {
     "threads": "readers and writers on many threads",
     "mutation": "mutants of the stream core killed by the tests",
 }
-FULL_ONLY = {"mutation"}
+# Those of the screen measure times of pictures, which other checks beside them would change.
+FULL_ONLY = {"mutation", "screen_kills", "screen_passwords", "screen_sync"}
 MOST_SHOWN = 50  # failures of one check
 LONGEST = ["fuzzing", "mutation", "valgrind", "truncations", "bit_flips"]  # started first
 
