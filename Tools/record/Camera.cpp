@@ -18,6 +18,7 @@ namespace Recorder {
 namespace {
 
 constexpr std::size_t s_queuedPictures = 8;
+constexpr Instant s_longestInQueue = 150 * s_millisecond;
 
 AVPixelFormat formatOf(PixelLayout layout) {
     switch (layout) {
@@ -147,13 +148,18 @@ bool Camera::waitForTick() {
     }
 }
 
+/// Pictures that wait long would be lost with a recorder that is killed, so a slow encoder gets fewer of them.
+bool Camera::isBehind() const {
+    return queue_.size() >= s_queuedPictures || (!queue_.empty() && now() - queue_.front().instant > s_longestInQueue);
+}
+
 void Camera::serveTick() {
     bool isFull = false;
     Instant due = 0;
     {
         const std::lock_guard lock(mutex_);
         due = nextTick_;
-        isFull = queue_.size() >= s_queuedPictures;
+        isFull = isBehind();
     }
     const std::optional<GrabbedPicture> grabbed = isFull ? grabber_.askPointer() : grabber_.grab();
     if (!grabber_.isAlive())
@@ -165,7 +171,7 @@ void Camera::serveTick() {
         countDropped(due); // even if the end has come before its pixels
         return;
     }
-    Picture picture{converted(*grabbed), *time};
+    Picture picture{converted(*grabbed), *time, grabbed->instant};
     const std::lock_guard lock(mutex_);
     queue_.push_back(std::move(picture));
     ++taken_;

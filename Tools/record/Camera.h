@@ -59,12 +59,14 @@ public:
 private:
     struct Picture {
         FramePointer frame;
-        std::int64_t time = 0;
+        std::int64_t time = 0; ///< in the movie
+        Instant instant = 0;   ///< when it was taken
     };
 
     void takePictures();
     void encodePictures();
     void serveTick();
+    bool isBehind() const;
     void countDropped(Instant due);
     bool waitForTick();
     void skipMissedTicks();

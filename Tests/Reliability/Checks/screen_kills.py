@@ -32,6 +32,8 @@ def one_run(desk, streams, screen, number, result):
     killed = time.monotonic()
     code = subprocess.run([os.environ["ZULM_RECORD"], "--recover", recording.folder], capture_output=True,
                           check=False).returncode
+    if code == 1 and killed - begun < PICTURE:
+        return  # nothing had to be there yet
     if code != 0:
         result.failures.append(f"run {number}: killed after {killed - begun:.2f} s: recovery ends with {code}")
         result.lost += 1
@@ -92,7 +94,7 @@ def run(context):
     with desk.Desk() as screen:
         screen.show(0, 0, 1280, 700)
         screen.xdotool("mousemove", 299, 400)
-        for number in range(100 if context.full else 5):
+        for number in range(100 if context.full else 12):
             result.cases += 1
             screen.xdotool("mousemove", 299, 400)
             one_run(desk, streams, screen, number, result)
