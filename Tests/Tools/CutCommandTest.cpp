@@ -173,6 +173,37 @@ protected:
             })) << time;
     }
 
+    struct Piece {
+        double start;
+        double end;
+        double speed;
+    };
+
+    /// Every frame of the new movie is the one that the source shows at its time, and all pieces begin with one.
+    void expectFramesOf(const std::string& source, const std::vector<Piece>& pieces, int width = s_width,
+                        int height = s_height) const {
+        constexpr double rounding = 0.0001;
+        const std::vector<Frame> shown = framesOf(source, width, height);
+        const std::vector<Frame> frames = framesOf(out, width, height);
+        double base = 0;
+        std::size_t next = 0;
+        for (const auto& [start, end, speed] : pieces) {
+            ASSERT_LT(next, frames.size());
+            EXPECT_NEAR(frames[next].time, base, rounding);
+            const double stop = base + (end - start) / speed;
+            for (; next < frames.size() && (frames[next].time < stop - rounding || stop > frames.back().time); ++next) {
+                const double time = start + (frames[next].time - base) * speed + rounding;
+                auto expected = std::upper_bound(shown.begin(), shown.end(), time,
+                                                 [](double at, const Frame& frame) { return at < frame.time; });
+                expected = expected == shown.begin() ? expected : expected - 1;
+                EXPECT_NEAR(frames[next].marker.x, expected->marker.x, 1) << frames[next].time;
+                EXPECT_NEAR(frames[next].marker.y, expected->marker.y, 1) << frames[next].time;
+            }
+            base = stop;
+        }
+        EXPECT_EQ(next, frames.size());
+    }
+
     double lengthOf(const std::string& stream) const {
         return std::stod(outputOf("ffprobe -v error -select_streams " + stream +
                                   " -show_entries stream=duration -of csv=p=0 '" + out + "'"));
@@ -266,15 +297,30 @@ TEST_F(CutCommand, CutsMoviesWithoutSound) {
 
 TEST_F(CutCommand, KeepsTurnedMoviesTurned) {
     ASSERT_EQ(cut(movie("turned"), {"--keep", "2-3", "--keep", "6-7@2"}).exitCode, 0);
-    const std::vector<Frame> source = framesOf(movie("turned"), s_height, s_width);
-    const std::vector<Frame> frames = framesOf(out, s_height, s_width);
-    ASSERT_GE(frames.size(), 40U);
-    for (const Frame& frame : frames) {
-        const double time = frame.time < 0.9999 ? 2 + frame.time : 6 + 2 * (frame.time - 1);
-        const auto shown = std::lround(time * s_framesPerSecond);
-        EXPECT_NEAR(frame.marker.x, source.at(static_cast<std::size_t>(shown)).marker.x, 1) << frame.time;
-        EXPECT_NEAR(frame.marker.y, source.at(static_cast<std::size_t>(shown)).marker.y, 1) << frame.time;
-    }
+    expectFramesOf(movie("turned"), {{2, 3, 1}, {6, 7, 2}}, s_height, s_width);
+}
+
+TEST_F(CutCommand, CutsMoviesThatBeginLaterAndRIFFFiles) {
+    const std::string late = folder / "late.mp4";
+    outputOf("ffmpeg -v error -itsoffset 0.35 -i " + movie("silent") + " -i " + movie("steady") +
+             " -map 0:v -map 1:a -c copy -t 3 " + late);
+    writeFile(late, contentsOf(late) + zulmAtom({locationStream()}));
+    const std::string riff = folder / "riff.avi"; // counts time in frames
+    outputOf("ffmpeg -v error -i " + movie("steady") + " -t 3 -c:v mjpeg -q:v 2 -c:a pcm_s16le " + riff);
+    writeFile(riff, contentsOf(riff) + zulmChunk({locationStream()}));
+    for (const std::string& source : {late, riff})
+        for (const std::vector<std::string>& mode : {std::vector<std::string>{}, {"--fast"}}) {
+            SCOPED_TRACE(source + (mode.empty() ? "" : " --fast"));
+            std::vector<std::string> arguments{"--keep", "1.01-2.1", "--keep", "0.1-0.9", "--force", "--json"};
+            arguments.insert(arguments.end(), mode.begin(), mode.end());
+            const ToolResult result = cut(source, arguments);
+            ASSERT_EQ(result.exitCode, 0) << result.errors;
+            std::vector<Piece> pieces;
+            const auto document = nlohmann::json::parse(result.output);
+            for (const auto& piece : document.at("files").at(0).at("pieces"))
+                pieces.push_back({piece.at("start"), piece.at("end"), piece.at("speed")});
+            expectFramesOf(source, pieces);
+        }
 }
 
 TEST_F(CutCommand, KeepsTheSoundInTime) {

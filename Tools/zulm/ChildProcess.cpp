@@ -6,6 +6,7 @@
 
 #include <fmt/core.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <csignal>
@@ -128,12 +129,10 @@ ChildResult runChild(const std::vector<std::string>& words, const std::function<
             if (&end == ends.data())
                 take(bytes);
             else
-                result.errors += bytes;
+                result.errors += bytes.substr(0, s_mostErrors - std::min(s_mostErrors, result.errors.size()));
             if (bytes.empty())
                 end.fd = -1; // which `poll` leaves alone
         }
-        if (result.errors.size() > 2 * s_mostErrors)
-            result.errors.erase(0, result.errors.size() - s_mostErrors);
     }
     result.exitCode = child.wait();
     NotedSignals::check();

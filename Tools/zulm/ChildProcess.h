@@ -11,7 +11,7 @@ namespace Zulm {
 
 struct ChildResult {
     int exitCode = 0;   ///< 128 + n if signal n ended it
-    std::string errors; ///< the end of what it wrote on standard error
+    std::string errors; ///< the beginning of what it wrote on standard error
 };
 
 /// Runs a program that is searched for in PATH, without a shell. Its standard input is empty. Calls `take` with what it

@@ -35,11 +35,9 @@ std::string numberFor(const Rational& value) {
 void requireDone(const std::string& program, int exitCode, const std::string& errors, const std::string& what) {
     if (exitCode == 0)
         return;
-    std::string_view text = errors;
-    while (text.ends_with('\n'))
-        text.remove_suffix(1);
-    const std::size_t lastLine = text.rfind('\n');
-    text = text.substr(lastLine == std::string_view::npos ? 0 : lastLine + 1);
+    std::string_view text = std::string_view(errors).substr(0, errors.find('\n')); // the others follow from the first
+    if (const std::size_t mark = text.find("] "); text.starts_with('[') && mark != std::string_view::npos)
+        text.remove_prefix(mark + 2); // which part of ffmpeg says it
     throw Failure(fmt::format("{} cannot {}: {}; nothing was written", program, what,
                               text.empty() ? fmt::format("it ended with {}", exitCode) : std::string(text)));
 }

@@ -97,9 +97,15 @@ private:
                              media_.otherStreams, media_.otherStreams == 1 ? "is" : "are"));
     }
 
+    std::string container() const {
+        const std::string extension = std::filesystem::path(name_).extension().string();
+        return extension == ".mov" || extension == ".MOV" ? "mov" : "mp4";
+    }
+
     PictureCut pictureCut() {
-        return {ffmpeg_, source_, *media_.picture, folder_.path(),
-                [this](const Rational& edited) { progress_.moveTo(millisecondsOf(edited)); }};
+        return {ffmpeg_,         source_,
+                *media_.picture, folder_.path(),
+                container(),     [this](const Rational& edited) { progress_.moveTo(millisecondsOf(edited)); }};
     }
 
     void join(const std::vector<EditPiece>& pieces) {
@@ -121,8 +127,7 @@ private:
         add(words, {"-c:v", "copy", "-c:a", "aac", "-b:a", "192k", "-map_metadata", "-1"});
         if (!files_.empty() && files_.back().name.ends_with(".nut"))
             add(words, {"-bsf:v", lastFrameFilter(), "-video_track_timescale", std::to_string(s_ticksPerSecond)});
-        const std::string extension = std::filesystem::path(name_).extension().string();
-        add(words, {"-f", extension == ".mov" || extension == ".MOV" ? "mov" : "mp4", mediaAddress(output_)});
+        add(words, {"-f", container(), mediaAddress(output_)});
         ffmpeg_.run(words, "put the pieces of " + name_ + " together");
     }
 

@@ -25,11 +25,19 @@ std::string addressIn(const PictureCut& cut, const std::string& file) {
     return mediaAddress((std::filesystem::path(cut.folder) / file).string());
 }
 
-/// A time between a frame and the one before it; nothing for the first one and after the last one.
+/// How far the frame after this one is, in seconds; nothing after the last one.
+std::optional<Rational> distanceAfter(const PictureStream& pictures, std::size_t frame) {
+    if (frame + 1 >= pictures.frames.size())
+        return std::nullopt;
+    return pictures.secondsOf(pictures.frames[frame + 1] - pictures.frames[frame]);
+}
+
+/// A time a little before a frame and after the one before it; nothing for the first one and after the last one. It is
+/// nearer to this frame, because ffmpeg rounds it to units of the stream, which may be as long as a frame.
 std::optional<Rational> timeBefore(const PictureStream& pictures, std::size_t frame) {
     if (frame == 0 || frame >= pictures.frames.size())
         return std::nullopt;
-    return (pictures.secondsOf(pictures.frames[frame - 1]) + pictures.secondsOf(pictures.frames[frame])) / 2;
+    return pictures.secondsOf(pictures.frames[frame]) - *distanceAfter(pictures, frame - 1) / 4;
 }
 
 // Encoding --------------------------------------------------------------------------------------------------------
@@ -71,15 +79,16 @@ private:
         return {first, std::max(first + 1, piece.isHeld() ? 0 : cut_.pictures.firstFrom(piece.end))};
     }
 
-    /// The times of the new frames are counted in nanoseconds here, and rounded once by the encoder.
+    /// The first frame is shown from the start on, also if that is before its time. The times of the new frames are
+    /// counted in nanoseconds here, and rounded once by the encoder.
     std::string filterFor(const EditPiece& piece) const {
         const auto [first, end] = framesOf(piece);
-        std::string filter;
+        std::string filter = "settb=1/1000000000,";
         if (const auto start = timeBefore(cut_.pictures, first))
             filter += fmt::format("trim=start={},", secondsFor(*start));
         if (const auto stop = timeBefore(cut_.pictures, end))
             filter += fmt::format("trim=end={},", secondsFor(*stop));
-        filter += fmt::format("settb=1/1000000000,setpts='round(max(0,(PTS*TB-{})/{})/TB)'", numberFor(piece.start),
+        filter += fmt::format("setpts='if(N,round(max(0,(PTS*TB-{})/{})/TB),0)'", numberFor(piece.start),
                               numberFor(piece.speed));
         if (piece.speed > 1)
             filter += fmt::format(",select='isnan(prev_selected_t)+gte(t-prev_selected_t,{:.9f})'", leastDistance_);
@@ -171,16 +180,16 @@ private:
         return {begin, end == places_.ends.end() ? pictures.packets.size() : end->packet};
     }
 
-    /// Opens the source at a time at which the key frame is shown: one that is rounded must not be before it.
+    /// Opens the source a little after the key frame: a time that is rounded must not be before it.
     void copy(const EditPiece& piece, const std::string& file) const {
         const PictureStream& pictures = cut_.pictures;
         const auto [begin, end] = packetsOf(piece);
-        const std::size_t frame = pictures.shownAt(pictures.secondsOf(pictures.packets[begin].time));
-        const Rational time = timeBefore(pictures, frame + 1).value_or(pictures.end());
-        Words words = cut_.source.openedAt(begin == 0 ? std::nullopt : std::optional(time));
+        const Rational time = pictures.secondsOf(pictures.packets[begin].time);
+        const Rational shown = distanceAfter(pictures, pictures.shownAt(time)).value_or(0);
+        Words words = cut_.source.openedAt(begin == 0 ? std::nullopt : std::optional(time + shown / 4));
         const auto add = [&words](const Words& more) { words.insert(words.end(), more.begin(), more.end()); };
         add({"-map", fmt::format("0:{}", pictures.index), "-c", "copy", "-frames:v", std::to_string(end - begin)});
-        add({"-f", "mov", addressIn(cut_, file)});
+        add({"-f", cut_.container, addressIn(cut_, file)});
         cut_.ffmpeg.run(words,
                         fmt::format("copy the pictures of {} from {} s on", cut_.source.name, secondsFor(piece.start)));
     }
@@ -232,7 +241,7 @@ std::vector<PictureFile> copiedPieces(const PictureCut& cut, const EditList& edi
     std::vector<PictureFile> files;
     const std::vector<Rational>& bases = edits.bases();
     for (std::size_t i = 0; i < bases.size(); ++i) {
-        files.push_back(copier.copied(edits.pieces()[i], fmt::format("{}.mov", i + 1)));
+        files.push_back(copier.copied(edits.pieces()[i], fmt::format("{}.{}", i + 1, cut.container)));
         cut.progress(bases[i]);
     }
     return files;

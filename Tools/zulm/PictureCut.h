@@ -24,6 +24,7 @@ struct PictureCut {
     const CutSource& source;
     const PictureStream& pictures;
     std::string folder;
+    std::string container; ///< of the new movie, as ffmpeg calls it: "mp4" or "mov"
     std::function<void(const ZULMetaData::Rational& edited)> progress; ///< called with seconds of the new movie
 };
 
