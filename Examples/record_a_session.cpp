@@ -1,56 +1,25 @@
-// Records a session of four seconds, attaches it to a movie and stamps the movie: record_a_session MOVIE
-// The stream files stay beside the movie.
+// Records a session of four seconds into a folder beside the movie, and saves it into the movie: record_a_session MOVIE
 
-#include "ZULMetaDataBridge/ZULMetaDataBridge.h"
+#include "ZULMetaDataSession/ZULMetaDataSession.h"
 
 #include <iostream>
-#include <vector>
 
 using namespace ZULMetaData;
 
 namespace {
 
-constexpr int s_leftDown = 1; // the bits that HumanReadableActions turns into texts
-constexpr int s_leftUp = 2;
-
-MediaTime milliseconds(int value) {
-    return {value, 1000};
-}
-
-std::vector<FileLocation> recordInto(const FileLocation& folder) {
-    RecordingRegionMetaDataWriter region(folder / "recordingRegion.dat");
-    region.writeAndFinalize(ScreenRect(0, 0, 1920, 1080));
-
-    TopmostAppNameMetaDataWriter application(folder / "topmostAppName.dat");
-    application.write("Editor", milliseconds(0));
-    application.write("Browser", milliseconds(3000));
-
-    CursorLocationMetaDataWriter location(folder / "cursorLocation.dat");
-    CursorActionMetaDataWriter action(folder / "cursorAction.dat");
-    for (int time = 0; time <= 4000; time += 100) {
-        location.write(ScreenPoint(200 + time * 0.4, 150 + time * 0.2), milliseconds(time));
-        if (time == 1000 || time == 1500 || time == 3500) { // three clicks
-            action.write(s_leftDown, milliseconds(time));
-            action.write(s_leftUp, milliseconds(time + 80));
+void record(SessionWriter& session) {
+    session.write<RecordingRegionKind>(Rect(0, 0, 1920, 1080));
+    session.write<TopmostAppNameKind>(0, "Editor");
+    session.write<TopmostAppNameKind>(3, "Browser");
+    for (int milliseconds = 0; milliseconds <= 4000; milliseconds += 100) {
+        const double time = milliseconds / 1000.0;
+        session.write<CursorLocationKind>(time, ScreenPoint(200 + 400 * time, 150 + 200 * time));
+        if (milliseconds == 1000 || milliseconds == 1500 || milliseconds == 3500) { // three clicks
+            session.write<CursorActionKind>(time, storedButtonAction(MouseButton::Left, true));
+            session.write<CursorActionKind>(time + 0.08, storedButtonAction(MouseButton::Left, false));
         }
     }
-
-    for (BaseMetaDataWriter* writer :
-         {static_cast<BaseMetaDataWriter*>(&application), static_cast<BaseMetaDataWriter*>(&location),
-          static_cast<BaseMetaDataWriter*>(&action)})
-        if (!writer->isHealthy())
-            std::cerr << writer->metaDataFile() << ": not everything could be recorded\n";
-    return {region.metaDataFile(), application.metaDataFile(), location.metaDataFile(), action.metaDataFile()};
-} // here the destructors of the writers close the files
-
-void saveInto(const FileLocation& movie, const std::vector<FileLocation>& files) {
-    std::vector<StreamSource> streams;
-    for (const FileLocation& file : files)
-        streams.push_back(StreamSource::file(file));
-    const SafeMovieSave save(movie);
-    for (const AttachedStream& stream : save.attach(streams).streams)
-        std::cout << findMetaDataKind(stream.type)->name << ": " << stream.entries << " entries\n";
-    save.stamp("Example", "1.0");
 }
 
 } // namespace
@@ -61,9 +30,15 @@ int main(int count, char** arguments) {
         return 2;
     }
     try {
-        const FileLocation movie = arguments[1];
-        saveInto(movie, recordInto(movie.parent_path()));
-    } catch (const SaveError& error) { // the movie is unchanged
+        const std::string movie = arguments[1];
+        SessionOptions options;
+        options.onLoss = [](const Error& loss) { std::cerr << loss.what() << '\n'; }; // such as a full disk
+        SessionWriter session(movie + ".recording", options);
+        record(session);
+        for (const AttachedStream& stream : session.saveInto(movie, "Example", "1.0").streams)
+            std::cout << metaDataKindName(stream.type) << ": " << stream.entries << " entries\n";
+        session.removeFiles();
+    } catch (const Error& error) { // the movie is unchanged, and the stream files still exist
         std::cerr << error.what() << '\n';
         return 1;
     }

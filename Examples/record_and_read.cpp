@@ -1,17 +1,18 @@
-#include "ZULMetaDataBridge/ZULMetaDataBridge.h"
+#include "ZULMetaDataSession/ZULMetaDataSession.h"
 #include <iostream>
 using namespace ZULMetaData;
 
 int main() {
-    CursorLocationMetaDataWriter writer("CursorLocation.dat");
-    writer.write(ScreenPoint(640.5, 360), MediaTime(0, 600)); // at 0 s
-    writer.write(ScreenPoint(652, 371), MediaTime(10, 600));  // at 10/600 s
-    writer.finish();
-    if (!writer.isHealthy()) // for example, because the disk is full
-        std::cerr << "only " << writer.entriesWritten() << " positions could be recorded\n";
-    SafeMovieSave("Movie.mp4").attach({StreamSource::file("CursorLocation.dat")}); // throws if it fails
+    SessionWriter session("Movie.mp4.recording"); // a new folder, which only you can enter
+    session.write<CursorLocationKind>(0, {640, 360});
+    session.write<CursorLocationKind>(1.5, {652, 371}); // 1.5 s later
+    session.write<TopmostAppNameKind>(1.5, "Editor");
+    session.saveInto("Movie.mp4", "Recorder", "1.0"); // throws if it fails, and leaves the movie as it was
+    session.removeFiles();
 
-    CursorLocationMetaDataParser parser("Movie.mp4");
-    for (const EntryDictionary& entry : *parser.read())
-        std::cout << entry.get<std::int32_t>("x") << ' ' << entry.get<float>("timestamp") << '\n';
+    const Recording recording("Movie.mp4");
+    const Track<CursorLocationKind>& positions = recording.track<CursorLocationKind>();
+    for (const double time : {0.5, 2.0})
+        std::cout << "at " << time << " s the cursor is at " << *positions.at(time) << '\n';
+    std::cout << "on top: " << recording.track<TopmostAppNameKind>().values().back() << '\n';
 }

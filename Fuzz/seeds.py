@@ -14,6 +14,7 @@ import zlib
 
 SOURCE = pathlib.Path(__file__).resolve().parents[1]
 sys.path.insert(0, str(SOURCE / "Tests/Reliability"))
+import edit_list_seeds  # noqa: E402
 import recordings  # noqa: E402
 
 READERS = {
@@ -109,6 +110,7 @@ def seeds(streams):
     yield "append_walk", bare
     yield "uuid_text", [text.encode() for text in IDENTIFIERS]
     yield "image_decode", list(pictures())
+    yield from edit_list_seeds.seeds()
     files = [(0, movie) for movie in all_movies[:3]] + [(1, all_riffs[0])]
     files += [(2, streams[kind]) for kind in ("cursorImage", "keyboardAction", "slideTitles", "systemData")]
     yield "commands", [bytes([command, kind]) + contents for command in range(COMMANDS) for kind, contents in files]

@@ -1,7 +1,7 @@
 #pragma once
 
 // The platform's own report of a failed assertion, raised directly: unlike `assert` it names the place that the
-// caller gives, and it stays in release builds.
+// caller passes, and it stays in release builds.
 
 namespace ZULMetaData {
 

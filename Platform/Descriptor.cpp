@@ -1,11 +1,18 @@
 #include "Platform/Descriptor.h"
 
 #include <system_error>
+#include <utility>
 
 namespace ZULMetaData {
 
 void throwSystemError(int error, const std::string& what) {
     throw std::system_error(error, std::generic_category(), what);
+}
+
+void Descriptor::close() {
+    const int number = std::exchange(number_, -1); // it is closed even if closing fails
+    if (number >= 0 && ::close(number) != 0 && errno != EINTR)
+        throwSystemError(errno, "cannot be closed");
 }
 
 std::size_t Descriptor::readAt(std::uint64_t position, std::span<char> bytes) const {

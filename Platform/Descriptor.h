@@ -34,13 +34,16 @@ public:
     explicit Descriptor(int number) : number_(number) {}
     ~Descriptor() {
         if (number_ >= 0)
-            close(number_);
+            ::close(number_);
     }
     Descriptor(const Descriptor&) = delete;
     Descriptor& operator=(const Descriptor&) = delete;
 
     int number() const { return number_; }
     bool isOpen() const { return number_ >= 0; }
+
+    /// Closes the file before its scope ends. Throws if the system reports that bytes were lost.
+    void close();
 
     /// Reads bytes and returns their number, which is smaller than asked for only at the end of the file.
     std::size_t readAt(std::uint64_t position, std::span<char> bytes) const;

@@ -9,12 +9,12 @@
 
 namespace ZULMetaData {
 
-/// Keeps others who open the file this way out as long as it lives; readers are not disturbed. Every failure is a
-/// `std::system_error`, as it is of a `Descriptor`.
+/// Keeps out others who open the file this way as long as it lives. Readers are not disturbed. Every failure is a
+/// `std::system_error`, as with a `Descriptor`.
 class DurableFile : Descriptor {
 public:
-    /// Opens a file that exists, for reading and writing. Throws for anything but a regular file, and where another
-    /// one holds it open this way.
+    /// Opens a file that exists, for reading and writing. Throws for anything but a regular file, and if another
+    /// program holds it open this way.
     explicit DurableFile(const FileLocation& file);
 
     using Descriptor::readAt;

@@ -5,7 +5,9 @@
 #include <algorithm>
 #include <cstdio>
 #include <fcntl.h>
+#include <filesystem>
 #include <span>
+#include <sys/stat.h>
 #include <system_error>
 #include <vector>
 
@@ -62,7 +64,7 @@ public:
 
 private:
 #if defined(SEEK_DATA) && defined(SEEK_HOLE)
-    /// Where stored bytes begin, at `position` or after it.
+    /// Returns the first position of stored bytes, at `position` or after it.
     std::uint64_t nextData(std::uint64_t position) const {
         const off_t data = lseek(source_.number(), static_cast<off_t>(position), SEEK_DATA);
         if (data >= 0)
@@ -70,7 +72,7 @@ private:
         return errno == ENXIO && sourceSize() >= end_ ? end_ : position; // else the read reports what is wrong
     }
 
-    /// Where they end. A file system that knows no holes has one at the end of the file.
+    /// Returns their end. A file system that knows no holes has one at the end of the file.
     std::uint64_t nextHole(std::uint64_t position) const {
         const off_t hole = lseek(source_.number(), static_cast<off_t>(position), SEEK_HOLE);
         const bool isFound = hole >= 0 && static_cast<std::uint64_t>(hole) > position;
@@ -181,6 +183,16 @@ void renameOverPlaceholder(const FileLocation& from, const FileLocation& to) {
     const int reason = errno;
     unlink(to.c_str());
     throwSystemError(reason, s_cannotRename);
+}
+
+bool createPrivateFolder(const FileLocation& folder) {
+    if (mkdir(folder.c_str(), S_IRWXU) == 0)
+        return true;
+    const int reason = errno;
+    std::error_code unknown;
+    if (reason != EEXIST || !std::filesystem::is_directory(folder, unknown))
+        throwSystemError(reason, "cannot be created");
+    return false;
 }
 
 } // namespace ZULMetaData

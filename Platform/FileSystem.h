@@ -40,4 +40,8 @@ ZULMETADATA_API void renameWithoutReplacing(const FileLocation& from, const File
 /// replaces. A reader may see that empty file for a moment.
 ZULMETADATA_API void renameOverPlaceholder(const FileLocation& from, const FileLocation& to);
 
+/// Creates a folder that only its owner may enter, unless there is a folder of that name. Its parent must exist. Throws
+/// `std::system_error`. Returns whether it was created.
+ZULMETADATA_API bool createPrivateFolder(const FileLocation& folder);
+
 } // namespace ZULMetaData

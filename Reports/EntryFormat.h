@@ -26,7 +26,7 @@ class EntryDocument {
 public:
     void add(const char* key, std::int32_t value) { document_[key] = value; }
     void add(const char* key, std::uint32_t value) { document_[key] = value; }
-    /// As text: more than a JSON number holds everywhere.
+    /// Adds it as a text, because it may not fit into a number of JSON.
     void add(const char* key, std::uint64_t value) { document_[key] = std::to_string(value); }
     void add(const char* key, float value);
     void add(const char* key, double value) { document_[key] = numberDocument(value); }
@@ -67,13 +67,13 @@ ZULMetaData::EntryKeys tableKeys() {
     return keys;
 }
 
-/// What is wrong with an entry that could be read all the same; empty where nothing is.
+/// Returns what is wrong with an entry that could be read all the same. Empty if nothing is.
 std::string damageOf(const nlohmann::ordered_json& entry);
 
-/// In one line, without its end. Texts are escaped, and what is not UTF-8 in them shows byte by byte.
+/// Returns the entry in one line, without its end. Texts are escaped, and what is not UTF-8 in them shows byte by byte.
 std::string textLine(const nlohmann::ordered_json& entry);
 
-/// The fields under `keys`. Texts are escaped, but for the ends of their lines; "further" is a JSON array.
+/// Returns the fields under `keys`. Texts are escaped, except for the ends of their lines; "further" is a JSON array.
 std::string csvLine(const nlohmann::ordered_json& entry, const ZULMetaData::EntryKeys& keys);
 std::string csvHeader(const ZULMetaData::EntryKeys& keys);
 

@@ -1,6 +1,6 @@
 #pragma once
 
-// What `zulm info` tells of a file.
+// What `zulm info` says about a file.
 
 #include "Reports/JsonWriter.h"
 #include "Reports/Layout.h"
@@ -15,7 +15,7 @@
 
 namespace Zulm {
 
-/// What is read before the first word of it is told.
+/// What is read before anything is printed.
 struct FileInfo {
     std::optional<double> duration;
     std::vector<ZULMetaData::StreamReport> streams;
@@ -25,20 +25,20 @@ struct FileInfo {
 /// Throws `FileError` if the file cannot be read.
 FileInfo inspect(ZULMetaData::RecordingFile& recording);
 
-/// The rate between the first and the last entry; empty if they are at one time or have none.
+/// Returns the rate between the first and the last entry. Empty if they are at one time or have none.
 std::optional<double> entriesPerSecond(const ZULMetaData::StreamReport& stream);
 
-/// Visits what lies inside of the file's metadata and is no stream.
+/// Visits the items inside of the file's metadata that are not streams.
 void visitForeignAtoms(ZULMetaData::RecordingFile& recording, const std::function<void(const LayoutItem& atom)>& visit);
 
-/// The texts of a creator with everything that is stored in their fields.
+/// Returns the texts of a creator with everything that is stored in their fields.
 nlohmann::ordered_json creatorDocument(const ZULMetaData::CreatorAttributes& creator);
 std::string shownCreator(const ZULMetaData::CreatorAttributes& creator); ///< "Mac 1.2 on version 6.1.0"
 
 /// Writes the file's object of `zulm info --json`.
 void writeInfo(JsonWriter& writer, ZULMetaData::RecordingFile& recording, const FileInfo& file);
 
-/// The same object as a whole.
+/// Returns the same object as a whole.
 nlohmann::ordered_json infoDocument(ZULMetaData::RecordingFile& recording);
 
 } // namespace Zulm

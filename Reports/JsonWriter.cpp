@@ -2,6 +2,11 @@
 
 #include "Reports/Text.h"
 
+#include <fmt/core.h>
+
+#include <algorithm>
+#include <cstdlib>
+
 namespace Zulm {
 
 using Json = nlohmann::ordered_json;
@@ -10,8 +15,41 @@ namespace {
 
 constexpr int s_indent = 2;
 
+/// Returns the end of the number that begins at `begin`.
+std::size_t endOfNumber(const std::string& document, std::size_t begin) {
+    return std::min(document.find_first_not_of("0123456789.eE+-", begin), document.size());
+}
+
+/// Returns the number in the fewest digits that tell it from all others, or as it is written if it has these already.
+std::string shortestNumber(const std::string& written) {
+    std::string shortest = fmt::format("{}", std::strtod(written.c_str(), nullptr));
+    const bool isFraction = written.find('.') != std::string::npos && !written.ends_with(".0");
+    return isFraction && shortest.size() < written.size() ? shortest : written;
+}
+
+/// Returns the document with its numbers in the fewest digits. The serializer writes one digit too many for about one
+/// number in two thousand.
+std::string withShortestNumbers(std::string document) {
+    constexpr std::size_t fewest = 15; // digits that the serializer writes only if they are needed
+    bool isInText = false;
+    for (std::size_t i = 0; i < document.size(); ++i) {
+        const char c = document[i];
+        if (c == '"')
+            isInText = !isInText;
+        else if (isInText && c == '\\')
+            ++i;
+        else if (!isInText && c >= '0' && c <= '9') {
+            const std::size_t size = endOfNumber(document, i) - i;
+            if (size > fewest)
+                document.replace(i, size, shortestNumber(document.substr(i, size)));
+            i = endOfNumber(document, i) - 1;
+        }
+    }
+    return document;
+}
+
 std::string text(const Json& document, int indent) {
-    return shownJSON(document.dump(indent, ' ', false, Json::error_handler_t::replace));
+    return shownJSON(withShortestNumbers(document.dump(indent, ' ', false, Json::error_handler_t::replace)));
 }
 
 } // namespace

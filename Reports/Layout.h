@@ -1,6 +1,7 @@
 #pragma once
 
-// How a container is put together: its items, what is inside its metadata atom, and where they end too early.
+// How a container is put together: its items, what is inside its metadata atom, and the places at which they end too
+// early.
 
 #include "ZULMetaData/ZULMetaData.h"
 
@@ -30,7 +31,7 @@ struct LayoutItem {
     std::string headerForm() const;
 };
 
-/// Where nothing further could be found, though there is more, and why.
+/// The place after which nothing could be found, although there is more, and the reason.
 struct LayoutEnd {
     std::uint64_t offset;
     std::string reason; ///< a sentence without its full stop

@@ -6,7 +6,7 @@
 
 namespace Zulm {
 
-/// All of `text` as a decimal number, "inf" and "nan" among them. None where it is anything else, or too large.
+/// All of `text` as a decimal number, "inf" and "nan" among them. Empty if it is anything else, or too large.
 std::optional<double> realNumber(const std::string& text);
 
 /// All of `text` as a whole number in decimal digits and nothing else. Empty if it is anything else, or too large.

@@ -26,16 +26,16 @@ void beginReport(JsonWriter& writer, const std::string& command);
 /// Ends what is open, then writes the errors and the end of the document.
 void endReport(JsonWriter& writer, const std::vector<ReportedError>& errors);
 
-/// What is reported of a file begins with: {"path": ...}, and its bytes as "path_base64" where they are not UTF-8.
+/// Returns what the report on a file begins with: {"path": ...}, and its bytes as "path_base64" if they are not UTF-8.
 nlohmann::ordered_json fileHeader(const std::string& path);
 
 /// Adds a text, and its bytes as "KEY_base64" if they are not UTF-8.
 void addText(nlohmann::ordered_json& document, const std::string& key, const std::string& bytes);
 
-/// The name of a registered kind, else null.
+/// Returns the name of a registered kind, or null.
 nlohmann::ordered_json kindDocument(const ZULMetaData::uuid& type);
 
-/// A number as it is, "Infinity", "-Infinity" or "NaN" where it is none, null where there is nothing.
+/// Returns a number as it is; "Infinity", "-Infinity" or "NaN" if it is not finite; null if there is none.
 nlohmann::ordered_json numberDocument(std::optional<double> number);
 
 } // namespace Zulm

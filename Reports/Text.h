@@ -10,7 +10,7 @@
 
 namespace Zulm {
 
-/// Printable ASCII as it is, all else, and the backslash, as \xNN.
+/// Returns printable ASCII as it is, and all else, and the backslash, as \xNN.
 std::string printable(std::string_view bytes);
 
 /// Returns the text with an escape for everything that cannot be seen: \xNN for an ASCII control character and for a
@@ -30,7 +30,7 @@ std::string shownJSON(const std::string& document);
 /// Returns a text for people to read in one line: white space as spaces, [U+NNNN] for what cannot be seen.
 std::string readableLine(const std::string& text);
 
-/// `bytes` as they are if they are UTF-8, else with U+FFFD in place of what is not.
+/// Returns `bytes` as they are if they are UTF-8, and otherwise with U+FFFD in place of what is not.
 std::string validText(const std::string& bytes);
 
 /// Returns one word of a command that can be pasted into a shell: as it is, or quoted. `shownMessage` leaves it alone.

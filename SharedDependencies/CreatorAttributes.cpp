@@ -25,7 +25,7 @@ void store(const std::string& text, char (&field)[Size]) {
     std::memcpy(field, text.data(), lengthCutAtCharacter(text, Size - 1));
 }
 
-/// Stays inside the field even where a record read from disk lacks its zero byte.
+/// Stays inside the field even if a record from disk lacks its zero byte.
 template <std::size_t Size>
 std::string load(const char (&field)[Size]) {
     return {std::begin(field), std::find(std::begin(field), std::end(field), '\0')};

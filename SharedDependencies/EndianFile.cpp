@@ -15,7 +15,7 @@ bool isPipe(const char* path) {
     return std::filesystem::is_fifo(path, ignored);
 }
 
-/// Repeated where a signal interrupts it.
+/// Opens the file again if a signal interrupts it.
 template <class Stream>
 void openFile(Stream& stream, const char* path, std::ios_base::openmode mode) {
     if (isPipe(path)) {

@@ -54,7 +54,7 @@ inline FieldInfo imageBytes(Record& record) {
     return {image.imageData, image.imageDataSize};
 }
 
-/// Wraps around where the data part is too small for a hot spot; such an image never fits.
+/// Wraps around if the data part is too small for a hot spot; such an image never fits.
 inline std::uint32_t imageSizeV1(const Record& record) {
     return record.justMetadataSize - s_hotspotSize;
 }

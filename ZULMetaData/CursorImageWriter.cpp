@@ -128,7 +128,7 @@ private:
 };
 
 /// What walking the schema writes, for entries that the put area has room for: a cursor that was seen before takes a
-/// quarter of the time. False, having written nothing, where it has not.
+/// quarter of the time. Returns false if it has not; nothing is written then.
 bool packEntry(Record& record, std::ostream& stream, int version) {
     std::uint64_t baseSize = 0;
     std::uint64_t dataSize = 0; // may be more than its 32 bits on disk

@@ -1,8 +1,9 @@
 #pragma once
 
-// Reads a file in blocks that are small behind a seek and grow where bytes follow one another: a walk over headers far
-// apart and a list of a million entries want different ones, and the buffer of a file keeps the one that it opened
-// with. In a sparse movie of 200,000 atoms blocks of 8 KiB take 1.3 times as long as these, 64 KiB seven times.
+// Reads a file in blocks that are small after a seek and grow while bytes are read in sequence. A walk over headers
+// that lie far apart needs small blocks and a list of a million entries needs large ones, but the buffer of a file
+// keeps the size with which it was opened. In a sparse movie of 200,000 atoms, blocks of 8 KiB take 1.3 times as long
+// as these, and blocks of 64 KiB seven times.
 
 #include <array>
 #include <cstddef>

@@ -6,7 +6,7 @@ namespace ZULMetaData::detail {
 
 namespace {
 
-/// Seeking a file throws its buffer away: shorter distances are cheaper read over.
+/// Seeking a file discards its buffer. It is cheaper to read over a shorter distance.
 constexpr std::uint64_t s_readOverLimit = 2048;
 
 constexpr std::uint64_t s_lastPosition = std::numeric_limits<std::streamoff>::max();
@@ -21,7 +21,7 @@ bool PositionedInput::moveTo(std::uint64_t target) {
 }
 
 void PositionedInput::catchUp() {
-    const std::uint64_t distance = position_ - streamPosition_; // huge where the way leads back
+    const std::uint64_t distance = position_ - streamPosition_; // huge if the target lies before the position
     if (distance == 0)
         return;
     if (distance <= s_readOverLimit)

@@ -1,6 +1,6 @@
 #pragma once
 
-// An input stream whose position is counted instead of asked for, bounded by the size of its file.
+// An input stream whose position is counted here and not queried, bounded by the size of its file.
 
 #include "SharedDependencies/EndianFile.h"
 #include "SharedDependencies/Export.h"
@@ -13,10 +13,10 @@
 
 namespace ZULMetaData::detail {
 
-/// Uses a stream of the caller. Moving costs nothing; the stream follows when the next bytes are read.
+/// Uses a stream of the caller. Moving costs nothing, because the stream is moved when the next bytes are read.
 class ZULMETADATA_API PositionedInput {
 public:
-    /// `position` is where the stream stands.
+    /// `position` is the current position of the stream.
     PositionedInput(std::istream& stream, std::uint64_t position, std::uint64_t total)
         : stream_(stream), streamPosition_(position), position_(position), total_(total) {}
 
@@ -24,10 +24,10 @@ public:
     std::uint64_t total() const { return total_; }
     bool enoughBytesLeft(std::uint64_t needed) const { return total_ >= needed && position_ <= total_ - needed; }
 
-    /// False, leaving the position, where no file position can hold `target`.
+    /// Returns false, and leaves the position, if no file position can hold `target`.
     bool moveTo(std::uint64_t target);
 
-    /// Reads exactly `size` bytes. False where they reach beyond the total or fail to come.
+    /// Reads exactly `size` bytes. Returns false if they reach beyond the total or cannot be read.
     bool read(void* bytes, std::size_t size) { return readBuffered(bytes, size) || readStream(bytes, size); }
 
     template <class Integer>
@@ -49,8 +49,9 @@ private:
     std::uint64_t total_;
 };
 
-/// Out of the stream's get area, where all that is passed over and wanted lies in it. A walk over small entries comes
-/// this way almost every time, and so does one that goes back: an atom may end inside the header that was read.
+/// Reads from the stream's get area, if it holds all bytes that are passed over and read. Almost every read of a walk
+/// over small entries succeeds here, and so does a walk that goes back: an atom may end inside the header that was
+/// read.
 inline bool PositionedInput::readBuffered(void* bytes, std::size_t size) {
     std::streambuf& buffer = *stream_.rdbuf();
     const auto distance = static_cast<std::ptrdiff_t>(position_ - streamPosition_);

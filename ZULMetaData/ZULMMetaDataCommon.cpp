@@ -89,7 +89,7 @@ std::uint8_t uuid::hexCharsToUint8(const char* chars) {
 
 namespace {
 
-/// A separator stands in front of bytes 4, 6, 8 and 10.
+/// A separator stands before bytes 4, 6, 8 and 10.
 constexpr bool isGroupStart(int byte) {
     return byte >= 4 && byte <= 10 && byte % 2 == 0;
 }

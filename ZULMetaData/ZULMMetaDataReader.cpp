@@ -25,8 +25,8 @@ bool readSupportedHeader(std::istream& stream, std::uint64_t start, int version,
 
 namespace {
 
-/// Appends `count` characters: at once where the get area holds them, else in pieces, so that no more memory is asked
-/// for than the input can fill until it turns out to be shorter.
+/// Appends `count` characters: at once if the get area holds them, and otherwise in pieces, so that no more memory is
+/// asked for than the input can fill until it turns out to be shorter.
 void appendCharacters(std::istream& stream, std::uint32_t count, std::string& text) {
     if (stream.good() && StreamBufferAccess::available(*stream.rdbuf()) >= count) {
         text.append(StreamBufferAccess::getPosition(*stream.rdbuf()), count);

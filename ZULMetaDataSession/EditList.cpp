@@ -8,7 +8,7 @@ namespace ZULMetaData {
 namespace {
 
 constexpr std::size_t s_mostPieces = 1'000'000;
-constexpr std::size_t s_mostBits = 16'384;
+constexpr std::size_t s_mostBits = 65'536;
 constexpr std::size_t s_mostBitsOfNumber = 3'321;              // a thousand decimal digits
 constexpr std::size_t s_mostStoredBits = std::size_t{1} << 31; // 256 MiB
 constexpr std::size_t s_freeBits = 64;                         // so many are stored without further memory
@@ -83,7 +83,7 @@ EditRange parseEditRange(std::string_view text) {
     const auto end = mark == std::string_view::npos ? std::nullopt : parseEditTime(text.substr(mark + 1));
     if (!start || !end)
         refuse('"' + std::string(text) + "\" is no range; write two times such as 10-12.5, 61/3-25 or 0:10-1:30");
-    const EditRange range{*start, *end};
+    EditRange range{*start, *end};
     requireOrder(range);
     return range;
 }
@@ -118,19 +118,8 @@ void EditList::add(EditPiece piece) {
     if (pieces_.size() >= s_mostPieces)
         refuse("the list has more than " + std::to_string(s_mostPieces) + " pieces");
     pieces_.push_back(std::move(piece));
-    duration_ = duration;
+    bases_.push_back(std::exchange(duration_, duration));
     storedBits_ = bits;
-}
-
-std::vector<Rational> EditList::bases() const {
-    std::vector<Rational> bases;
-    bases.reserve(pieces_.size());
-    Rational base;
-    for (const EditPiece& piece : pieces_) {
-        bases.push_back(base);
-        base = base + piece.duration;
-    }
-    return bases;
 }
 
 EditList EditList::without(std::vector<EditRange> removed, const Rational& duration) {

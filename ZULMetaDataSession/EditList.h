@@ -72,7 +72,7 @@ class ZULMETADATA_API EditList {
 public:
     /// Adds [start, end) at a speed. Throws `Error` and adds nothing if a time is negative, `end` is not after `start`,
     /// or the speed is not above 0; also if a number has more than 1,000 digits, or the length of the edited movie
-    /// cannot be written with 16,384 binary digits above and below the line.
+    /// cannot be written with 65,536 binary digits above and below the line.
     void keep(const Rational& start, const Rational& end, const Rational& speed = 1);
 
     /// Adds "A-B" or "A-B@SPEED": a range as `parseEditRange` reads it, and a speed as `Rational::parse` does. Throws
@@ -87,7 +87,7 @@ public:
     const Rational& duration() const { return duration_; }           ///< returns the length of the edited movie
 
     /// Returns where each piece begins on the edited time line, in seconds.
-    std::vector<Rational> bases() const;
+    const std::vector<Rational>& bases() const { return bases_; }
 
     /// Returns a JSON document with the exact numbers, which `read` reads back. It ends with a line feed.
     std::string json() const;
@@ -111,6 +111,7 @@ private:
     void add(EditPiece piece);
 
     std::vector<EditPiece> pieces_;
+    std::vector<Rational> bases_;
     Rational duration_;
     std::size_t storedBits_ = 0; ///< of all bases
 };

@@ -235,6 +235,8 @@ Natural Natural::difference(std::int64_t leftFactor, const Natural& left, std::i
 }
 
 Natural operator*(const Natural& left, const Natural& right) {
+    if (left.isOne() || right.isOne())
+        return left.isOne() ? right : left;
     Natural product;
     product.digits_.assign(left.digits_.size() + right.digits_.size(), 0);
     for (std::size_t i = 0; i < left.digits_.size(); ++i) {
@@ -253,15 +255,15 @@ Natural operator*(const Natural& left, const Natural& right) {
 std::strong_ordering operator<=>(const Natural& left, const Natural& right) {
     if (left.digits_.size() != right.digits_.size())
         return left.digits_.size() <=> right.digits_.size();
-    for (std::size_t i = left.digits_.size(); i-- > 0;)
-        if (left.digits_[i] != right.digits_[i])
-            return left.digits_[i] <=> right.digits_[i];
-    return std::strong_ordering::equal;
+    const auto [first, second] = std::mismatch(left.digits_.rbegin(), left.digits_.rend(), right.digits_.rbegin());
+    return first == left.digits_.rend() ? std::strong_ordering::equal : *first <=> *second;
 }
 
 Natural::Division Natural::dividedBy(const Natural& divisor) const {
     if (*this < divisor)
         return {{}, *this};
+    if (divisor.isOne())
+        return {*this, {}};
     if (divisor.digits_.size() == 1) {
         Natural quotient = *this;
         const std::uint32_t remainder = quotient.divideBy(divisor.digits_[0]);
@@ -273,8 +275,8 @@ Natural::Division Natural::dividedBy(const Natural& divisor) const {
     over.resize(digits_.size() + 1);
     Natural quotient;
     quotient.digits_.resize(over.size() - under.size());
-    for (std::size_t place = quotient.digits_.size(); place-- > 0;)
-        quotient.digits_[place] = divideAt({over.data() + place, under.size() + 1}, under);
+    for (std::size_t place = quotient.digits_.size(); place > 0; --place)
+        quotient.digits_[place - 1] = divideAt({over.data() + place - 1, under.size() + 1}, under);
     Natural remainder;
     remainder.digits_ = std::move(over);
     remainder.trim();
@@ -304,8 +306,8 @@ Natural greatestCommonDivisor(Natural left, Natural right) {
         std::swap(left, right);
     while (right.digits_.size() > 2)
         Natural::reduceTogether(left, right);
-    if (right.isZero())
-        return left;
+    if (right.isZero() || right.isOne())
+        return right.isZero() ? left : right;
     const std::uint64_t remainder = left.dividedBy(right).remainder.in64Bits().value_or(0);
     return Natural(std::gcd(remainder, right.in64Bits().value_or(0)));
 }

@@ -25,6 +25,7 @@ public:
     static Natural powerOfTwo(std::size_t exponent) { return Natural(1).shiftedLeft(exponent); }
 
     bool isZero() const { return digits_.empty(); }
+    bool isOne() const { return digits_.size() == 1 && digits_[0] == 1; }
     std::size_t bits() const;                       ///< returns the position after the highest bit that is set
     std::optional<std::uint64_t> in64Bits() const;  ///< returns nothing for a number of more than 64 bits
     std::size_t trailingZeros() const;              ///< returns the number of zero bits below the lowest bit

@@ -25,7 +25,7 @@ constexpr std::size_t s_mostDigits = 1000;
 constexpr std::uint64_t s_mostOfSmall = std::numeric_limits<std::int64_t>::max();
 
 std::uint64_t magnitudeOf(std::int64_t number) {
-    return number < 0 ? -static_cast<std::uint64_t>(number) : static_cast<std::uint64_t>(number);
+    return number < 0 ? static_cast<std::uint64_t>(-(number + 1)) + 1 : static_cast<std::uint64_t>(number);
 }
 
 Natural naturalOf(UnsignedWide number) {
@@ -68,6 +68,21 @@ struct Rational::Large {
 };
 
 struct Rational::Arithmetic {
+    /// The magnitudes of a number, which outlives them. Those of a large number are not copied.
+    class Magnitudes {
+    public:
+        explicit Magnitudes(const Rational& number) : large_(number.large_.get()) {
+            if (!large_)
+                small_ = {Natural(magnitudeOf(number.numerator_)), Natural(magnitudeOf(number.denominator_))};
+        }
+
+        const Large* operator->() const { return large_ ? large_ : &small_; }
+
+    private:
+        const Large* large_;
+        Large small_;
+    };
+
     static Rational made(bool isNegative, std::uint64_t numerator, std::uint64_t denominator) {
         Rational result;
         result.numerator_ = static_cast<std::int64_t>(numerator);
@@ -91,8 +106,7 @@ struct Rational::Arithmetic {
 
     static Rational made(Wide numerator, UnsignedWide denominator) {
         const bool isNegative = numerator < 0;
-        const UnsignedWide magnitude =
-            isNegative ? -static_cast<UnsignedWide>(numerator) : static_cast<UnsignedWide>(numerator);
+        const auto magnitude = static_cast<UnsignedWide>(isNegative ? -numerator : numerator);
         if (std::max(magnitude, denominator) <= s_mostOfSmall)
             return made(isNegative, static_cast<std::uint64_t>(magnitude), static_cast<std::uint64_t>(denominator));
         return made(isNegative, naturalOf(magnitude), naturalOf(denominator));
@@ -101,12 +115,6 @@ struct Rational::Arithmetic {
     static Rational reduced(bool isNegative, const Natural& numerator, const Natural& denominator) {
         const Natural common = greatestCommonDivisor(numerator, denominator);
         return made(isNegative, numerator.dividedBy(common).quotient, denominator.dividedBy(common).quotient);
-    }
-
-    static Large magnitudes(const Rational& number) {
-        if (number.large_)
-            return *number.large_;
-        return {Natural(magnitudeOf(number.numerator_)), Natural(magnitudeOf(number.denominator_))};
     }
 
     static Rational negated(Rational number) {
@@ -135,20 +143,20 @@ struct Rational::Arithmetic {
     }
 
     static Rational largeSum(const Rational& left, const Rational& right) {
-        const Large first = magnitudes(left);
-        const Large second = magnitudes(right);
-        const Natural common = greatestCommonDivisor(first.denominator, second.denominator);
-        const Natural firstRest = first.denominator.dividedBy(common).quotient;
-        const Natural secondRest = second.denominator.dividedBy(common).quotient;
-        const Natural firstPart = first.numerator * secondRest;
-        const Natural secondPart = second.numerator * firstRest;
+        const Magnitudes first(left);
+        const Magnitudes second(right);
+        const Natural common = greatestCommonDivisor(first->denominator, second->denominator);
+        const Natural firstRest = first->denominator.dividedBy(common).quotient;
+        const Natural secondRest = second->denominator.dividedBy(common).quotient;
+        const Natural firstPart = first->numerator * secondRest;
+        const Natural secondPart = second->numerator * firstRest;
         const bool isNegative = firstPart < secondPart ? right.isNegative() : left.isNegative();
         const Natural numerator = left.isNegative() == right.isNegative() ? firstPart + secondPart
                                   : firstPart < secondPart                ? secondPart - firstPart
                                                                           : firstPart - secondPart;
         const Natural cancelled = greatestCommonDivisor(numerator.dividedBy(common).remainder, common);
         return made(isNegative, numerator.dividedBy(cancelled).quotient,
-                    firstRest * second.denominator.dividedBy(cancelled).quotient);
+                    firstRest * second->denominator.dividedBy(cancelled).quotient);
     }
 
     static Rational product(const Rational& left, const Rational& right) {
@@ -163,13 +171,13 @@ struct Rational::Arithmetic {
     }
 
     static Rational largeProduct(const Rational& left, const Rational& right) {
-        const Large a = magnitudes(left);
-        const Large b = magnitudes(right);
-        const Natural first = greatestCommonDivisor(a.numerator, b.denominator);
-        const Natural second = greatestCommonDivisor(b.numerator, a.denominator);
+        const Magnitudes a(left);
+        const Magnitudes b(right);
+        const Natural first = greatestCommonDivisor(a->numerator, b->denominator);
+        const Natural second = greatestCommonDivisor(b->numerator, a->denominator);
         return made(left.isNegative() != right.isNegative(),
-                    a.numerator.dividedBy(first).quotient * b.numerator.dividedBy(second).quotient,
-                    a.denominator.dividedBy(second).quotient * b.denominator.dividedBy(first).quotient);
+                    a->numerator.dividedBy(first).quotient * b->numerator.dividedBy(second).quotient,
+                    a->denominator.dividedBy(second).quotient * b->denominator.dividedBy(first).quotient);
     }
 
     static std::strong_ordering compare(const Rational& left, const Rational& right) {
@@ -181,20 +189,23 @@ struct Rational::Arithmetic {
                                     : std::strong_ordering::equal;
         }
         if (left.isNegative() != right.isNegative())
-            return right.isNegative() <=> left.isNegative();
-        const Large a = magnitudes(left);
-        const Large b = magnitudes(right);
-        const auto order = a.numerator * b.denominator <=> b.numerator * a.denominator;
-        return left.isNegative() ? 0 <=> order : order;
+            return left.isNegative() ? std::strong_ordering::less : std::strong_ordering::greater;
+        const Magnitudes a(left);
+        const Magnitudes b(right);
+        const Natural first = a->numerator * b->denominator;
+        const Natural second = b->numerator * a->denominator;
+        return left.isNegative() ? second <=> first : first <=> second;
     }
 
     static double magnitude(std::uint64_t numerator, std::uint64_t denominator) {
         constexpr std::uint64_t mostExact = std::uint64_t{1} << s_precision;
         if (std::max(numerator, denominator) <= mostExact)
             return static_cast<double>(numerator) / static_cast<double>(denominator);
-        const int shift = shiftFor(std::bit_width(numerator), std::bit_width(denominator));
+        const int shift = shiftFor(static_cast<std::size_t>(std::bit_width(numerator)),
+                                   static_cast<std::size_t>(std::bit_width(denominator)));
         const UnsignedWide over = UnsignedWide{numerator} << std::max(shift, 0);
         const UnsignedWide under = UnsignedWide{denominator} << std::max(-shift, 0);
+        assert(under != 0);
         return rounded(static_cast<std::uint64_t>(over / under), over % under == 0, -shift);
     }
 
@@ -260,9 +271,9 @@ double Rational::nearest() const {
 }
 
 std::string Rational::text() const {
-    const Large magnitudes = Arithmetic::magnitudes(*this);
-    const std::string integer = (isNegative() ? "-" : "") + magnitudes.numerator.text();
-    return magnitudes.denominator == Natural(1) ? integer : integer + '/' + magnitudes.denominator.text();
+    const Arithmetic::Magnitudes magnitudes(*this);
+    const std::string integer = (isNegative() ? "-" : "") + magnitudes->numerator.text();
+    return magnitudes->denominator.isOne() ? integer : integer + '/' + magnitudes->denominator.text();
 }
 
 std::size_t Rational::bits() const {

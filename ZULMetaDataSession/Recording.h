@@ -50,8 +50,8 @@ public:
     /// extension of `name` does. The bytes are read by one thread at a time.
     Recording(ByteSource bytes, const std::string& name);
 
-    Recording(Recording&&) noexcept;
-    Recording& operator=(Recording&&) noexcept;
+    Recording(Recording&&) noexcept;            ///< takes the recording over; the other one must not be used any more
+    Recording& operator=(Recording&&) noexcept; ///< the same; closes what was open before
     ~Recording();
 
     const std::string& name() const;        ///< what errors call it: the path, or the name of the caller's bytes

@@ -46,10 +46,11 @@ struct SystemData {
     friend bool operator==(const SystemData&, const SystemData&) = default; ///< compares all fields
 };
 
-/// The type of the values in the track of a kind.
+namespace detail {
+
 template <class Kind>
 struct TrackValue {
-    using Type = typename Kind::Value; ///< the value of the stream
+    using Type = typename Kind::Value;
 };
 template <>
 struct TrackValue<CursorActionKind> {
@@ -68,9 +69,11 @@ struct TrackValue<SystemDataKind> {
     using Type = SystemData;
 };
 
-/// The type of the values in the track of a kind.
+} // namespace detail
+
+/// The type of the values in the track of a kind: that of its stream, or one that says more.
 template <class Kind>
-using TrackValueOf = typename TrackValue<Kind>::Type;
+using TrackValueOf = typename detail::TrackValue<Kind>::Type;
 
 /// Return the value in a track for the value in a stream. An appearance has the picture of its own entry alone.
 ///@{

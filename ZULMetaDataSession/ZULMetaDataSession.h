@@ -2,16 +2,23 @@
 
 // Includes everything with which recorders and editors are written.
 
+#include "AbandonedSession.h"
 #include "EditList.h"
 #include "Error.h"
+#include "Insights/Camera.h"
 #include "Insights/Chapters.h"
 #include "Insights/Clicks.h"
+#include "Insights/CursorPath.h"
 #include "Insights/Idle.h"
+#include "Insights/Insights.h"
 #include "Insights/KeyCaptions.h"
+#include "Insights/Zooms.h"
 #include "Picture.h"
 #include "Rational.h"
 #include "Recording.h"
+#include "RecordingClock.h"
 #include "Retiming.h"
+#include "SessionWriter.h"
 #include "Snapshot.h"
 #include "Timeline.h"
 #include "Track.h"

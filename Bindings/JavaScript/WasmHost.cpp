@@ -5,7 +5,7 @@
 #include <cstddef>
 #include <cstdint>
 
-// zulmetadata.js reads these where they lie.
+// zulmetadata.js reads these in place.
 static_assert(sizeof(void*) == 4 && sizeof(ZulmStream) == 64 && sizeof(ZulmColumn) == 24);
 static_assert(offsetof(ZulmStream, kind) == 0 && offsetof(ZulmStream, uuid) == 4 &&
               offsetof(ZulmStream, version) == 8 && offsetof(ZulmStream, entries) == 16 &&
@@ -18,7 +18,8 @@ static_assert(offsetof(ZulmColumn, name) == 0 && offsetof(ZulmColumn, type) == 4
 
 extern "C" {
 
-/// Gives how many bytes it put at `bytes`; -1 where reading failed. Positions fit into the 53 bits of a number.
+/// Returns the number of bytes that it put at `bytes`, or -1 if reading failed. Positions fit into the 53 bits of a
+/// number.
 __attribute__((import_module("zulm"), import_name("readAt"))) std::int32_t
 zulm_host_read_at(double position, void* bytes, std::size_t size);
 

@@ -40,6 +40,34 @@ export interface Entries {
   columns: Record<string, Column>;
 }
 
+/** Rows that were computed from a recording, by columns. */
+export interface Table {
+  /** What the rows are, such as "clicks". */
+  kind: string;
+  /** The times in seconds: of a state, or when something begins. */
+  time: Float64Array;
+  /** The values by their names. A number that is not known is NaN, a text or a picture null. */
+  columns: Record<string, Column | (string | null)[]>;
+}
+
+/** A stream for a movie that was cut. */
+export interface RetimedStream {
+  /** The kind of the stream. */
+  kind: string;
+  /** The whole stream, header included. */
+  bytes: Uint8Array;
+  /** True if these are the bytes of the recording: the kind holds at all times, or is not known. */
+  isCopied: boolean;
+  /** The number of entries of pieces, at their new times. */
+  moved: number;
+  /** The number of entries that say what held already at the beginning of a piece. */
+  carried: number;
+  /** The number of presses and releases of buttons that were down at an edge. */
+  added: number;
+  /** The number of entries whose time is not finite. */
+  leftOut: number;
+}
+
 /** A source of bytes that you write yourself, for example over an archive or a cache. */
 export interface ByteSource {
   /** The number of bytes. */
@@ -82,16 +110,31 @@ export class Recording {
   entries(kind: string): Entries;
   /** Returns the entries of a hidden stream, by its index in `hidden`. */
   hiddenEntries(index: number): Entries;
+  /** Returns the entries of a kind with a finite time, in the order of their times. */
+  track(kind: string): Entries;
   /**
-   * Returns the keys of the stream "keyboardAction" as captions show them, in the order of their times. Throws a
-   * `ZulmError` if there is no such stream. The columns are:
-   *
-   * - `label`, the text of the key. Unless `showsKeys` is true, a bullet takes the place of what was typed.
-   * - `isTyped`, 1 for a character without modifiers, which makes words with its neighbours, or 0.
-   * - `first`, the index of the key that begins its caption.
-   * - `end`, the time in seconds until which its caption is shown.
+   * Returns what holds at each of these times, in seconds. The columns are those of `zulm_states` in `zulmetadata_c.h`.
+   * With "linear", the default, the cursor moves between
+   * two entries, but rests while nothing was recorded; with "none" it is where the last entry says.
    */
-  keyCaptions(showsKeys?: boolean): Entries;
+  at(times: Iterable<number>, options?: { interpolate?: 'linear' | 'none' }): Table;
+  /**
+   * Returns what follows from the recording. `parameters` change the defaults that Docs/insights.md lists, by their
+   * names in lower case with underscores, such as `{ least: 3 }`. The columns are described in `zulmetadata_c.h`.
+   *
+   * Captions have one row for each key: `label`, its text; `is_typed`, 1 for a character without modifiers, which makes
+   * words with its neighbours; `first`, the row that begins its caption; `end`, until when its caption is shown. Unless
+   * `shows_keys` is true, a bullet takes the place of what was typed.
+   */
+  insights(
+    name: 'clicks' | 'captions' | 'idle' | 'chapters' | 'zooms' | 'cursor_path' | 'camera',
+    parameters?: Record<string, number | boolean>,
+  ): Table;
+  /**
+   * Returns the streams for a movie that was cut by an edit list: the JSON document, or the object that it describes.
+   * Throws a `ZulmError` for a list that cannot be.
+   */
+  retime(edits: string | object): RetimedStream[];
   /** Returns the file's object of `zulm info --json`. */
   info(): object;
   /** Returns the file's object of `zulm verify --json`, in which images are known by the size that they state. */

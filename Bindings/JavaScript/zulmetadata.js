@@ -119,6 +119,17 @@ class Core {
     }
   }
 
+  withNumbers(numbers, use) {
+    const place = this.exports.malloc(Math.max(numbers.byteLength, 8)) >>> 0;
+    if (place === 0) throw new ZulmError('out of memory');
+    new Float64Array(this.memory, place, numbers.length).set(numbers);
+    try {
+      return use(place);
+    } finally {
+      this.exports.free(place);
+    }
+  }
+
   textAt(place) {
     const bytes = new Uint8Array(this.memory, place >>> 0);
     return utf8.decode(bytes.subarray(0, bytes.indexOf(0)));
@@ -253,10 +264,60 @@ export class Recording {
     });
   }
 
-  keyCaptions(showsKeys) {
+  track(kind) {
+    const { time, columns } = this.entries(kind);
+    const rows = Uint32Array.from(time.keys()).filter((row) => Number.isFinite(time[row]));
+    rows.sort((a, b) => time[a] - time[b] || a - b);
+    const ordered = (values) => Array.from(rows, (row) => values[row]);
+    const sorted = (values) => (Array.isArray(values) ? ordered(values) : values.constructor.from(ordered(values)));
+    return {
+      kind,
+      time: sorted(time),
+      columns: Object.fromEntries(Object.entries(columns).map(([name, values]) => [name, sorted(values)])),
+    };
+  }
+
+  at(times, { interpolate = 'linear' } = {}) {
+    if (interpolate !== 'linear' && interpolate !== 'none')
+      throw new TypeError(`interpolate is 'linear' or 'none', not '${interpolate}'`);
+    return this.#guarded((core) => {
+      const numbers = Float64Array.from(times);
+      return core.withNumbers(numbers, (place) =>
+        core.takeEntries(
+          core.call('zulm_states', this.#handle, place, numbers.length, interpolate === 'linear' ? 1 : 0),
+          'states',
+        ),
+      );
+    });
+  }
+
+  insights(name, parameters = {}) {
+    const list = Object.entries(parameters).map(([key, value]) => `${key}=${Number(value)}`);
     return this.#guarded((core) =>
-      core.takeEntries(core.call('zulm_read_key_captions', this.#handle, showsKeys ? 1 : 0), 'keyboardAction'),
+      core.withText(name, (namePlace) =>
+        core.withText(list.join(), (listPlace) =>
+          core.takeEntries(core.call('zulm_insight', this.#handle, namePlace, listPlace), name),
+        ),
+      ),
     );
+  }
+
+  retime(edits) {
+    const text = typeof edits === 'string' ? edits : JSON.stringify(edits);
+    return this.#guarded((core) => {
+      const { columns } = core.withText(text, (place) =>
+        core.takeEntries(core.call('zulm_retime', this.#handle, place), 'retimed'),
+      );
+      return columns.kind.map((kind, row) => ({
+        kind,
+        bytes: columns.bytes[row],
+        isCopied: columns.is_copied[row] === 1,
+        moved: columns.moved[row],
+        carried: columns.carried[row],
+        added: columns.added[row],
+        leftOut: columns.left_out[row],
+      }));
+    });
   }
 
   info() {

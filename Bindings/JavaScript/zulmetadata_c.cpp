@@ -2,6 +2,7 @@
 
 #include "Bindings/JavaScript/BlockCache.h"
 #include "Bindings/JavaScript/EntryColumns.h"
+#include "Bindings/Tables/SessionTables.h"
 #include "Reports/DumpDocument.h"
 #include "Reports/Findings.h"
 #include "Reports/InfoReport.h"
@@ -10,7 +11,6 @@
 #include "ZULMetaDataBridge/Source/RecordingFile.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 #include "ZULMetaDataBridge/Source/StoredFields.h"
-#include "ZULMetaDataSession/Insights/KeyCaptions.h"
 
 #include <fmt/core.h>
 
@@ -19,6 +19,7 @@
 #include <concepts>
 #include <exception>
 #include <limits>
+#include <locale>
 #include <memory>
 #include <new>
 #include <optional>
@@ -37,18 +38,27 @@ using namespace ZULMetaData::Bindings;
 struct ZulmRecording {
     struct Stream {
         StreamReport report;
-        std::string kind; // or its identifier where it has none
+        std::string kind; // or its identifier if it has none
         std::string uuid;
         ZulmStream summary; // points into these texts
     };
 
-    ZulmRecording(const ByteSource& bytes, const std::string& name)
-        : recording(bytes, name), duration(recording.duration()), found(summarized(recording.examinedStreams())),
-          hidden(summarized(recording.hiddenStreams())) {}
+    ZulmRecording(const ByteSource& source, const std::string& name)
+        : bytes(source), recording(source, name), duration(recording.duration()),
+          found(summarized(recording.examinedStreams())), hidden(summarized(recording.hiddenStreams())) {}
+
+    /// Returns what tables are made from. It is opened at the first call.
+    const Recording& session() {
+        if (!opened)
+            opened.emplace(bytes, recording.name());
+        return *opened;
+    }
 
     static std::vector<Stream> summarized(const std::vector<StreamReport>& reports);
 
+    ByteSource bytes;
     RecordingFile recording;
+    std::optional<Recording> opened;
     std::optional<double> duration;
     std::vector<Stream> found;
     std::vector<Stream> hidden;
@@ -71,7 +81,7 @@ std::string& lastError() {
     return message;
 }
 
-/// Keeps exceptions in. Null where `work` threw.
+/// Lets no exception out. Returns null if `work` throws.
 template <class Work>
 auto orNull(Work work) noexcept -> decltype(work()) {
     try {
@@ -158,31 +168,6 @@ ZulmEntries* readEntries(const ZulmRecording& opened, const StreamReport& stream
     });
 }
 
-/// Collects one row for each key.
-void collectKeyCaptions(const RecordingFile& recording, const StreamReport& stream, bool showsKeys,
-                        ZulmEntries& entries) {
-    std::vector<double> times;
-    std::vector<KeyInput> keys;
-    recording.readEntries<KeyStroke>(stream, [&](double time, const KeyStroke& key) {
-        times.push_back(time);
-        keys.push_back(keyInputOf(key));
-        return true;
-    });
-    KeyCaptionOptions options;
-    options.showsKeys = showsKeys;
-    entries.columns = {{"label", ZulmTexts}, {"isTyped", ZulmInt32}, {"first", ZulmInt32}, {"end", ZulmReal}};
-    for (const KeyCaption& caption : keyCaptions({std::move(times), std::move(keys)}, options)) {
-        const auto first = static_cast<std::int32_t>(entries.times.size());
-        for (const CaptionKey& key : caption.keys) {
-            entries.times.push_back(key.time);
-            entries.columns[0].add(key.label);
-            entries.columns[1].add(std::int32_t{key.isTyped});
-            entries.columns[2].add(first);
-            entries.columns[3].add(caption.end);
-        }
-    }
-}
-
 std::vector<StreamReport> streamsNamed(const ZulmRecording& opened, const char* kinds) {
     std::vector<StreamReport> streams;
     if (!kinds) {
@@ -197,6 +182,32 @@ std::vector<StreamReport> streamsNamed(const ZulmRecording& opened, const char* 
             streams.push_back(stream);
     }
     return streams;
+}
+
+/// Turns the columns of a table into those that the caller sees.
+ZulmEntries* entriesOf(Table table) {
+    auto entries = std::make_unique<ZulmEntries>();
+    entries->times = std::move(table.times);
+    for (const TableColumn& column : table.columns)
+        entries->columns.push_back(EntryColumn::of(column));
+    for (const EntryColumn& column : entries->columns)
+        entries->views.push_back(column.view());
+    return entries.release();
+}
+
+/// Reads a list such as "least=3,flicker=1".
+InsightParameters parametersIn(const char* text) {
+    InsightParameters parameters;
+    std::istringstream list(text ? text : "");
+    list.imbue(std::locale::classic());
+    for (std::string name; std::getline(list, name, '=');) {
+        double value = 0;
+        if (!(list >> value) || (list.peek() != ',' && !list.eof()))
+            throw std::invalid_argument("the parameters are not a list such as least=3,flicker=1");
+        parameters[name] = value;
+        list.ignore();
+    }
+    return parameters;
 }
 
 } // namespace
@@ -265,12 +276,20 @@ ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index) {
     return orNull([&] { return readEntries(*recording, recording->hidden[index].report); });
 }
 
-ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys) {
+ZulmEntries* zulm_states(ZulmRecording* recording, const double* times, size_t count, int32_t interpolates) {
     return orNull([&] {
-        const StreamReport& stream = streamNamed(*recording, metaDataKindName(KeyboardActionKind::type));
-        return entriesOf(*recording, stream, [&](ZulmEntries& entries) {
-            collectKeyCaptions(recording->recording, stream, showsKeys != 0, entries);
-        });
+        const Interpolation interpolation = interpolates != 0 ? Interpolation::Linear : Interpolation::Held;
+        return entriesOf(statesTable(recording->session(), {times, count}, interpolation));
+    });
+}
+
+ZulmEntries* zulm_insight(ZulmRecording* recording, const char* name, const char* parameters) {
+    return orNull([&] { return entriesOf(insightTable(recording->session(), name, parametersIn(parameters))); });
+}
+
+ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits) {
+    return orNull([&] {
+        return entriesOf(retimedTable(recording->session(), EditList::read(edits, recording->recording.name())));
     });
 }
 

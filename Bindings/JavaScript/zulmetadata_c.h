@@ -2,7 +2,7 @@
 #define ZULMETADATA_C_H
 
 /*
- * Recordings for programs that are not written in C++. The caller gives a function that reads bytes at a position, so
+ * Recordings for programs that are not written in C++. The caller passes a function that reads bytes at a position, so
  * that a recording may be a file, a slice of something larger, or anything else.
  *
  *     ZulmRecording* recording = zulm_open(readAt, &file, size, "Recording.mp4");
@@ -14,8 +14,8 @@
  *     zulm_free_entries(entries);
  *     zulm_close(recording);
  *
- * No exception leaves these functions: those that give a pointer give null where they fail, and `zulm_last_error` then
- * says why. One thread at a time may use a recording and what was read from it.
+ * No exception leaves these functions. Those that return a pointer return null if they fail, and `zulm_last_error` then
+ * returns the reason. One thread at a time may use a recording and what was read from it.
  */
 
 #include <stddef.h>
@@ -31,11 +31,12 @@ typedef struct ZulmRecording ZulmRecording;
 typedef struct ZulmEntries ZulmEntries;
 typedef struct ZulmText ZulmText;
 
-/* Reads `size` bytes from `position` on. Gives how many it read, fewer only where there are no more; -1 where reading
-   failed. */
+/* Reads `size` bytes from `position` on. Returns the number of bytes read, which is smaller only at the end, or -1 if
+   reading failed. */
 typedef int64_t (*ZulmReadAt)(void* context, uint64_t position, void* bytes, size_t size);
 
-/* What went wrong in the last call that failed, in words for a person. Valid until the next call that fails. */
+/* Returns what went wrong in the last call that failed, as a sentence for people. Valid until the next call that
+   fails. */
 const char* zulm_last_error(void);
 
 /* The first bytes say what the recording is; the extension of `name` counts only if they say nothing. `size` counts all
@@ -43,17 +44,17 @@ const char* zulm_last_error(void);
 ZulmRecording* zulm_open(ZulmReadAt readAt, void* context, uint64_t size, const char* name);
 void zulm_close(ZulmRecording* recording);
 
-/* "movie", "RIFF" or "stream". */
+/* Returns "movie", "RIFF" or "stream". */
 const char* zulm_container(const ZulmRecording* recording);
 
-/* Seconds; not a number where the recording does not tell. */
+/* Returns seconds; not a number if the recording does not say how long it is. */
 double zulm_duration(const ZulmRecording* recording);
 
 typedef struct {
-    const char* kind; /* its name, or its identifier where it has none */
+    const char* kind; /* its name, or its identifier if it has none */
     const char* uuid;
     int32_t version;
-    uint64_t entries; /* 0 where they cannot be decoded */
+    uint64_t entries; /* 0 if they cannot be decoded */
     uint64_t bytes;   /* that the file declares, header included */
     uint64_t offset;  /* of its header in the file */
     double first;     /* seconds, of the first and the last entry with a finite time; not a number without any */
@@ -64,8 +65,8 @@ typedef struct {
 size_t zulm_stream_count(const ZulmRecording* recording);
 const ZulmStream* zulm_stream(const ZulmRecording* recording, size_t index);
 
-/* Streams that the file holds and no reader finds, in its order: a later one of the kind took their place, or they lie
-   behind damage. Everything else here is about those that readers find. */
+/* Streams that the file holds and no reader finds, in the order of the file: a later stream of the same kind hides
+   them, or they follow damage. All other functions are about the streams that readers find. */
 size_t zulm_hidden_count(const ZulmRecording* recording);
 const ZulmStream* zulm_hidden(const ZulmRecording* recording, size_t index);
 
@@ -91,15 +92,28 @@ typedef struct {
     size_t distinct;
 } ZulmColumn;
 
-/* Of the stream of this kind, or with this identifier; as far as they are whole. */
+/* Return the whole entries of a stream, which is chosen by its kind or its identifier, or by its number. */
 ZulmEntries* zulm_read_entries(ZulmRecording* recording, const char* kind);
 ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index);
 
-/* The keys of the stream keyboardAction as captions show them, in the order of their times. The columns are "label",
-   the text of the key; "isTyped", 1 if the key makes words with its neighbours that are typed, or 0; "first", the
-   number of the entry that begins its caption; and "end", the seconds until which its caption is shown. If `showsKeys`
-   is 0, bullets take the place of what was typed. */
-ZulmEntries* zulm_read_key_captions(ZulmRecording* recording, int32_t showsKeys);
+/* Returns what holds at each of these times, in seconds. The columns are "x" and "y" of the cursor, "cursor_id",
+   "hotspot_x", "hotspot_y" and "picture" of what it looks like, "opacity", "buttons" and "modifiers" (names with "+"
+   between two, such as "shift+ctrl"), "window_x" to "window_height", "title", "application", "slide_title",
+   "slide_text", "slide_comment", "hover_x" to "hover_height", "region_x" to "region_height", "scale" and "cpu". A
+   number that is not known is not a number, a text that is not known is ZulmNothing. If `interpolates` is 0, the cursor
+   is where the last entry says; otherwise it moves between two entries, but rests while nothing was recorded. */
+ZulmEntries* zulm_states(ZulmRecording* recording, const double* times, size_t count, int32_t interpolates);
+
+/* Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path" or
+   "camera". `parameters` is null or a list such as "least=3". The captions have one row for each key: "label" is its
+   text, with a bullet in place of what was typed unless "shows_keys=1"; "is_typed" is 1 if it makes words with its
+   neighbours; "first" is the row that begins its caption, and "end" the time until which the caption is shown. */
+ZulmEntries* zulm_insight(ZulmRecording* recording, const char* name, const char* parameters);
+
+/* Returns the streams for a movie that was cut by an edit list, which is a JSON document: one row for each, with "kind"
+   and all its "bytes". "is_copied" is 1 if the bytes are those of the recording; otherwise "moved", "carried", "added"
+   and "left_out" count its entries. */
+ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits);
 
 void zulm_free_entries(ZulmEntries* entries);
 

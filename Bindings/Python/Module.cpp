@@ -2,12 +2,14 @@
 
 #include "Bindings/Python/EntryArrays.h"
 #include "Bindings/Python/PythonTexts.h"
+#include "Bindings/Python/SessionArrays.h"
 #include "Bindings/Python/StreamWriter.h"
 #include "ZULMetaDataBridge/Source/HumanReadableActions.h"
 #include "ZULMetaDataBridge/Source/KeyNames.h"
 #include "ZULMetaDataBridge/Source/RecordingFile.h"
 #include "ZULMetaDataBridge/Source/ReportedNames.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
+#include "ZULMetaDataSession/Error.h"
 
 #include <pybind11/numpy.h>
 #include <pybind11/pybind11.h>
@@ -159,6 +161,8 @@ void addErrors(py::module_& module) {
             setOSError(py::make_tuple(error.code().value(), error.code().message(), pathText(error.file())));
         } catch (const std::system_error& error) {
             setOSError(py::make_tuple(error.code().value(), pathText(error.what())));
+        } catch (const Error& error) {
+            PyErr_SetObject(PyExc_ValueError, pathText(error.what()).ptr());
         }
     });
 }
@@ -366,6 +370,7 @@ PYBIND11_MODULE(_core, module) {
     addRepairing(module);
     addSaving(module);
     addVerifying(module);
+    addSession(module);
 }
 
 } // namespace ZULMetaData::Python

@@ -151,7 +151,7 @@ TEST_F(CInterface, ReturnsKeysAsCaptionsShowThem) {
                              le32(0x100000) + f64(5) + le32(13) + le32(0);
     source_.bytes = streamHeader("2b7b6af5", 1, 16) + keys;
     const OpenRecording recording = opened(source_, "a.dat");
-    const ReadEntries shown(zulm_read_key_captions(recording.get(), 1));
+    const ReadEntries shown(zulm_insight(recording.get(), "captions", "shows_keys=1"));
     ASSERT_TRUE(shown) << zulm_last_error();
     ASSERT_EQ(zulm_entry_count(shown.get()), 4U);
     EXPECT_THAT(std::vector(zulm_entry_times(shown.get()), zulm_entry_times(shown.get()) + 4),
@@ -161,13 +161,13 @@ TEST_F(CInterface, ReturnsKeysAsCaptionsShowThem) {
     EXPECT_EQ(textOf(shown.get(), 0, 0), "h");
     EXPECT_EQ(textOf(shown.get(), 0, 2), "\xe2\x8c\x98S");
     EXPECT_EQ(textOf(shown.get(), 0, 3), "[returnKey]");
-    EXPECT_STREQ(zulm_column(shown.get(), 1)->name, "isTyped");
+    EXPECT_STREQ(zulm_column(shown.get(), 1)->name, "is_typed");
     EXPECT_THAT(valuesOf<std::int32_t>(shown.get(), 1), testing::ElementsAre(1, 1, 0, 0));
     EXPECT_STREQ(zulm_column(shown.get(), 2)->name, "first");
     EXPECT_THAT(valuesOf<std::int32_t>(shown.get(), 2), testing::ElementsAre(0, 0, 0, 3));
     EXPECT_STREQ(zulm_column(shown.get(), 3)->name, "end");
     EXPECT_THAT(valuesOf<double>(shown.get(), 3), testing::ElementsAre(3, 3, 3, 6.5));
-    const ReadEntries masked(zulm_read_key_captions(recording.get(), 0));
+    const ReadEntries masked(zulm_insight(recording.get(), "captions", nullptr));
     EXPECT_EQ(textOf(masked.get(), 0, 0), "\xe2\x80\xa2");
     EXPECT_EQ(textOf(masked.get(), 0, 3), "[returnKey]");
 }
@@ -231,8 +231,12 @@ TEST_F(CInterface, SaysWhatItCannotDo) {
     ASSERT_TRUE(recording);
     EXPECT_FALSE(zulm_read_entries(recording.get(), "slideText"));
     EXPECT_STREQ(zulm_last_error(), "Odd.mp4: holds no stream slideText");
-    EXPECT_FALSE(zulm_read_key_captions(recording.get(), 1));
-    EXPECT_STREQ(zulm_last_error(), "Odd.mp4: holds no stream keyboardAction");
+    EXPECT_FALSE(zulm_insight(recording.get(), "moods", nullptr));
+    EXPECT_STREQ(zulm_last_error(), "there are no insights moods");
+    EXPECT_FALSE(zulm_insight(recording.get(), "idle", "least"));
+    EXPECT_STREQ(zulm_last_error(), "the parameters are not a list such as least=3,flicker=1");
+    EXPECT_FALSE(zulm_retime(recording.get(), "{}"));
+    EXPECT_THAT(zulm_last_error(), HasSubstr("Odd.mp4: "));
     EXPECT_FALSE(zulm_read_entries(recording.get(), zulm_stream(recording.get(), 0)->uuid));
     EXPECT_THAT(zulm_last_error(), HasSubstr("cannot be decoded"));
     EXPECT_TRUE(std::isnan(zulm_stream(recording.get(), 0)->first) || zulm_stream(recording.get(), 0)->isKnown == 0);
@@ -261,7 +265,11 @@ TEST_F(CInterface, LivesThroughEveryDamagedFile) {
             EXPECT_EQ(entries != nullptr, stream.isKnown == 1) << file.name;
             EXPECT_LE(entries ? zulm_entry_count(entries.get()) : 0, stream.entries) << file.name;
         }
-        const ReadEntries captions(zulm_read_key_captions(recording.get(), 1));
+        for (const char* name : {"clicks", "captions", "idle", "chapters", "zooms"})
+            EXPECT_TRUE(ReadEntries(zulm_insight(recording.get(), name, nullptr))) << file.name << zulm_last_error();
+        constexpr double time = 0.5;
+        const ReadEntries states(zulm_states(recording.get(), &time, 1, 1));
+        EXPECT_EQ(states ? zulm_entry_count(states.get()) : 0, 1U) << file.name << zulm_last_error();
         for (std::size_t i = 0; i < zulm_hidden_count(recording.get()); ++i) {
             const ReadEntries entries(zulm_read_hidden(recording.get(), i));
             EXPECT_EQ(entries != nullptr, zulm_hidden(recording.get(), i)->isKnown == 1) << file.name;

@@ -103,6 +103,7 @@ def make_recordings(folder, zulm):
     for stream in (folder / "demo" / "streams").iterdir():
         shutil.copy(stream, folder / stream.name)
     shutil.rmtree(folder / "demo")
+    (folder / "Project.llc").write_text('{"version": 2, "cutSegments": [{"start": 1, "end": 3}]}\n')
     (folder / "private").mkdir()
     (folder / "Recordings").mkdir()
     shutil.copy(folder / "Recording.mp4", folder / "Recordings")

@@ -21,7 +21,7 @@ def kinds():
     recorded = (ROOT / "ZULMetaDataBridge" / "Source" / "MetaDataKinds.h").read_text()
     groups = dict(re.findall(r"uuid (s_\w+UUID) = detail::kindUUID\(0x(\w{8})\)", registry))
     values = dict((constant, value) for value, constant in re.findall(
-        r"StreamKind<(.+), (s_\w+UUID)>", recorded))
+        r"StreamKind<(.+), (s_\w+UUID)[,>]", recorded))
     names = {"std::int32_t": "int", "std::string": "text", "std::list<std::string>": "list of texts",
              "CursorImage": "cursor image"}
     yield "| kind | first group | version | value |"

@@ -124,6 +124,21 @@ TEST_P(RenameTest, LeavesNothingIfThereIsNothingToRename) {
     EXPECT_FALSE(std::filesystem::exists(target));
 }
 
+TEST_F(FileSystemTest, CreatesAFolderForItsOwnerAlone) {
+    const mode_t mask = umask(0);
+    EXPECT_TRUE(createPrivateFolder(folder / "private"));
+    umask(mask);
+    EXPECT_EQ(std::filesystem::status(folder / "private").permissions(), std::filesystem::perms::owner_all);
+    EXPECT_FALSE(createPrivateFolder(folder / "private")) << "it is there";
+}
+
+TEST_F(FileSystemTest, CreatesNoFolderInTheNameOfAFileAndNoneAboveIt) {
+    EXPECT_THROW(createPrivateFolder(target), std::system_error);
+    EXPECT_EQ(contentsOf(target), "what was there before");
+    EXPECT_THROW(createPrivateFolder(folder / "no folder/private"), std::system_error);
+    EXPECT_FALSE(std::filesystem::exists(folder / "no folder"));
+}
+
 INSTANTIATE_TEST_SUITE_P(InOneStep, RenameTest, testing::Values(renameWithoutReplacing));
 INSTANTIATE_TEST_SUITE_P(InTwoSteps, RenameTest, testing::Values(renameOverPlaceholder));
 

@@ -3,12 +3,15 @@ find_package(TIFF REQUIRED)
 # Some of these run other programs, which are ImageMagick's convert and pngcheck.
 zulm_add_tests(PlatformTests
   AssertionReportTest
+  CoarseClockTest
   DurableFileTest
   EncodedImageCheckTest
   EncodedImageInfoTest
   FileLocationTest
   FileSystemTest
   ImageTest
+  LockFileTest
+  NewFileTest
   PNGDecodeTest
   ProcessInfoTest
   TIFFDecodeTest)

@@ -1,5 +1,6 @@
 # What the checks of faults run: recorders that are killed, and a library that lets system calls fail.
 zulm_add_reliability_program(recorder recorder.cpp)
+target_link_libraries(recorder PRIVATE ZULMetaData::Session)
 zulm_add_reliability_program(library library.cpp)
 
 # For LD_PRELOAD: it stands in front of the C library, not on top of this one.

@@ -18,6 +18,9 @@ SOURCE = pathlib.Path(__file__).resolve().parents[2]
 # Module in Checks/ and the name in the table, in the table's order.
 CHECKS = {
     "kill_recorder": "recorder killed at random moments",
+    "screen_kills": "screen recorder killed at random moments, and on full disks",
+    "screen_passwords": "passwords that the screen recorder must not have",
+    "screen_sync": "picture of the screen recorder against its entries",
     "kill_system_calls": "attach, repair and stamp killed at every system call",
     "io_faults": "ENOSPC, EIO, EINTR and short transfers at every operation",
     "full_disk": "a real full disk at every fill level",
@@ -34,7 +37,8 @@ CHECKS = {
     "threads": "readers and writers on many threads",
     "mutation": "mutants of the stream core killed by the tests",
 }
-FULL_ONLY = {"mutation"}
+# Those of the screen measure times of pictures, which other checks beside them would change.
+FULL_ONLY = {"mutation", "screen_kills", "screen_passwords", "screen_sync"}
 MOST_SHOWN = 50  # failures of one check
 LONGEST = ["fuzzing", "mutation", "valgrind", "truncations", "bit_flips"]  # started first
 

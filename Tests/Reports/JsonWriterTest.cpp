@@ -3,6 +3,7 @@
 
 #include <gtest/gtest.h>
 
+#include <cstdlib>
 #include <string>
 
 namespace ZULMetaData::Test {
@@ -53,6 +54,22 @@ TEST_F(JsonWriterTest, IndentsAsAWholeDocumentIsIndented) {
     writeExample(writer);
     EXPECT_EQ(text, example().dump(2));
     EXPECT_EQ(writer.depth(), 0U);
+}
+
+TEST_F(JsonWriterTest, WritesNumbersInTheFewestDigits) {
+    // The serializer alone writes one digit more.
+    for (const char* number : {"16999.21443197597", "-7986.262166464448", "6219.204567222891"})
+        EXPECT_EQ(Zulm::jsonLine(Json(std::strtod(number, nullptr))), number);
+    for (const char* number : {"0.1", "1.0", "-0.0", "1e+300", "5e-324", "1.7976931348623157e+308", "100000000000000.0",
+                               "0.30000000000000004", "1.2345678901234568e-05"})
+        EXPECT_EQ(Zulm::jsonLine(Json(std::strtod(number, nullptr))), number);
+    EXPECT_EQ(Zulm::jsonLine(18364758544493064720U), "18364758544493064720");
+}
+
+TEST_F(JsonWriterTest, LeavesNumbersInTextsAlone) {
+    const Json document{{"1.00000000000000000000", "a\\\"1.00000000000000000000"}, {"b", {16999.21443197597, "\\"}}};
+    EXPECT_EQ(Zulm::jsonLine(document), R"({"1.00000000000000000000":"a\\\"1.00000000000000000000",)"
+                                        R"("b":[16999.21443197597,"\\"]})");
 }
 
 TEST_F(JsonWriterTest, WritesElementsInLines) {

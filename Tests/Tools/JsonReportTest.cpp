@@ -74,6 +74,7 @@ TEST_F(JsonReport, SaysThatAFileCannotBeOpened) {
                                                {"verify", none},
                                                {"atoms", none},
                                                {"grep", "a", none},
+                                               {"state", none, "--at", "1"},
                                                {"dump", "--format", "json", none},
                                                {"diff", none, movie()},
                                                {"diff", movie(), none},
@@ -102,6 +103,7 @@ TEST_F(JsonReport, SaysThatThereIsNothing) {
     expectError({"salvage", "--json", plain, "-o", folder / "streams"}, 4, plain, "no metadata streams");
     expectError({"redact", "--json", plain, "-o", folder / "out.mp4", "--keys"}, 4, plain, message);
     expectError({"attach", "--json", plain, "--from", plain, "-o", folder / "out.mp4"}, 4, plain, "no recording");
+    expectError({"state", "--json", plain, "--at", "1"}, 4, plain, message);
     expectError({"grep", "--json", "nowhere at all", movie()}, 4, movie(), "no text in it matches");
     EXPECT_EQ(errorsOf({"diff", "--json", plain, plain}, 4).size(), 2U);
     expectError({"dump", "--format", "json", "--stream", "systemData", streamFile("cpuUsage")}, 4,
@@ -111,6 +113,7 @@ TEST_F(JsonReport, SaysThatThereIsNothing) {
 TEST_F(JsonReport, HasNoErrorsIfAllIsFine) {
     EXPECT_EQ(errorsOf({"info", "--json", movie()}, 0), json::array());
     EXPECT_EQ(errorsOf({"dump", "--format", "json", movie()}, 0), json::array());
+    EXPECT_EQ(errorsOf({"state", "--json", movie(), "--at", "1"}, 0), json::array());
     EXPECT_EQ(errorsOf({"grep", "--json", "README", movie(), streamFile("topmostWindowTitle")}, 0), json::array());
 }
 

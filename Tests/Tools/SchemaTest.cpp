@@ -56,9 +56,10 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         EXPECT_EQ(file.path().filename(), name + ".schema.json");
         commands.push_back(name.substr(5));
     }
-    EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "detach", "diff", "dump", "edits",
-                                                        "extract", "grep", "info", "redact", "repair", "salvage",
-                                                        "stamp", "verify", "view"));
+    EXPECT_THAT(commands,
+                testing::UnorderedElementsAre("atoms", "attach", "compact", "cut", "detach", "diff", "dump", "edits",
+                                              "extract", "grep", "info", "insights", "record", "redact", "repair",
+                                              "retime", "salvage", "stamp", "state", "verify", "view"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
@@ -125,6 +126,23 @@ TEST_F(Schema, HoldsForGrep) {
         {outputOf({"grep", "e", movie(), streamFile("slideText")}), outputOf({"grep", "nowhere at all", movie()})});
 }
 
+TEST_F(Schema, HoldsForInsights) {
+    const std::string strange = written("strange.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1e300, "\xff"));
+    const std::string press = written("press.dat", streamHeader("2b7b6af0", 1, 12) + f64(1e300) + le32(1));
+    expectValid({outputOf({"insights", movie(), odd(), torn()}), outputOf({"insights", "--show-keys", movie()}),
+                 outputOf({"insights", strange, press, written("na\xff.dat", locations())})});
+}
+
+TEST_F(Schema, HoldsForState) {
+    const std::string strange = written("strange.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "\xff"));
+    const std::string cursors = written("cursors.dat", streamHeader("2b7b6af1", 2, 0) + le32(28) + f64(1) + le64(7) +
+                                                           le32(8) + le32(0) + le32(3));
+    std::vector<std::string> documents;
+    for (const std::string& file : {movie(), odd(), torn(), strange, cursors, streamFile("slideText")})
+        documents.push_back(outputOf({"state", file, "--at", "0,0.05,2.5,61/3"}));
+    expectValid(documents);
+}
+
 TEST_F(Schema, HoldsForAttachAndStamp) {
     const std::string tornNames = written("names.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "whole") +
                                                            textEntry(2, "torn").substr(0, 9));
@@ -143,7 +161,8 @@ TEST_F(Schema, HoldsForRetimeAndCut) {
                  outputOf({"retime", odd(), "--movie", open, "--remove", "1-5", "-o", folder / "2.mp4"}),
                  outputOf({"retime", plain, "--movie", plain, "--keep", "1-5", "-o", folder / "3.mp4"})});
     const std::string real = folder / "real.mp4";
-    ZULMetaData::Test::outputOf("ffmpeg -v error -f lavfi -i testsrc=size=64x64:rate=10 -t 3 -c:v libx264 -g 5 " + real);
+    ZULMetaData::Test::outputOf("ffmpeg -v error -f lavfi -i testsrc=size=64x64:rate=10 -t 3 -c:v libx264 -g 5 " +
+                                real);
     writeFile(real, contentsOf(real) + extendedAtom("ZULM", extendedAtom("DATA", locations())));
     writeFile(folder / "edits.json", R"({"schema": "zulm.edits", "schema_version": 1, "pieces": [
         {"start": 0, "end": 1, "speed": 2}, {"at": 1, "duration": 1}]})");
@@ -191,6 +210,8 @@ TEST_F(Schema, HoldsIfNothingCanBeReadOrFound) {
                                                {"atoms"},
                                                {"verify"},
                                                {"grep", "a"},
+                                               {"insights"},
+                                               {"state", "--at", "1"},
                                                {"diff", movie()},
                                                {"extract", "-o", folder / "streams"},
                                                {"salvage", "-o", folder / "streams"},

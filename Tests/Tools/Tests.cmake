@@ -28,6 +28,7 @@ zulm_add_tests(ToolsTests
   ExtractCommandTest
   GrepCommandTest
   InfoCommandTest
+  InsightsCommandTest
   JsonReportTest
   ManualTest
   OutOfMemoryTest
@@ -37,6 +38,7 @@ zulm_add_tests(ToolsTests
   SalvageCommandTest
   SchemaTest
   StampCommandTest
+  StateCommandTest
   ToolRunTest
   VerifyCommandTest
   ViewCommandTest)
@@ -48,3 +50,4 @@ target_compile_definitions(ToolsTests PRIVATE
   ZULM_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/Data"
   ZULM_HAS_PAGE=$<BOOL:${ZULM_VIEWER}>)
 add_dependencies(ToolsTests zulm)
+include(${CMAKE_CURRENT_LIST_DIR}/record/Tests.cmake)

@@ -60,8 +60,11 @@ protected:
         return recordingIn(output());
     }
 
+    /// As the page has it: nobody is told where the recording lay.
     Json reportOf(const std::string& command, const std::string& file) const {
-        return Json::parse(runTool({command, "--json", file}).output).at("files").at(0);
+        Json report = Json::parse(runTool({command, "--json", file}).output).at("files").at(0);
+        report["path"] = std::filesystem::path(file).filename().string();
+        return report;
     }
 };
 

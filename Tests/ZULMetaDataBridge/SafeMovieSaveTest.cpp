@@ -651,6 +651,43 @@ TEST_F(SafeSave, StampsAgainBehindTheFirst) {
     EXPECT_EQ(infos[1].creator.version(), "2");
 }
 
+TEST_F(SafeSave, AttachesAndStampsAsOneAfterTheOther) {
+    const auto files = sources({stream("a.dat", locationStream() + "torn")});
+    const std::string twice = folder / "Twice.mp4";
+    writeFile(movie, openEndedMedia());
+    writeFile(twice, openEndedMedia());
+    SafeMovieSave(twice).attach(files);
+    SafeMovieSave(twice).stamp("Recorder", "4.2");
+    const AttachResult result = SafeMovieSave(movie).attachAndStamp(AttachPlan(files), "Recorder", "4.2");
+    EXPECT_EQ(contentsOf(movie), contentsOf(twice));
+    EXPECT_EQ(result.repair.changes.size(), 1U);
+    ASSERT_EQ(result.streams.size(), 1U);
+    EXPECT_EQ(result.streams[0].bytesCut, 4U);
+    EXPECT_THROW(SafeMovieSave(movie).attachAndStamp(AttachPlan({}), "Recorder", "4.2"), SaveError);
+}
+
+TEST_F(SafeSave, DoesNeitherWhereAttachingOrStampingFails) {
+    const AttachPlan plan(sources({stream("a.dat", locationStream())}));
+    const std::size_t whole = media().size() + zulmAtom({locationStream()}).size() + 80;
+    for (std::size_t limit = media().size(); limit < whole; ++limit) {
+        writeFile(movie, openEndedMedia());
+        {
+            const FileSizeLimit fullDisk(limit);
+            EXPECT_THROW(SafeMovieSave(movie).attachAndStamp(plan, "Recorder", "4.2"), SaveError) << limit;
+        }
+        EXPECT_EQ(contentsOf(movie), openEndedMedia()) << limit;
+    }
+}
+
+TEST_F(SafeSave, MovesTheIndexOfFragmentsBehindTheStampToo) {
+    writeFile(movie, media() + atom("mfra", "index"));
+    const AttachPlan plan(sources({stream("a.dat", locationStream())}));
+    const AttachResult result =
+        SafeMovieSave(movie).attachAndStamp(plan, "Recorder", "4.2", SafeMovieSave::FragmentIndex::MoveToEnd);
+    EXPECT_EQ(result.fragmentIndex, FragmentIndexState::AtEnd);
+    EXPECT_EQ(bytesAt(std::filesystem::file_size(movie) - 13, 13), atom("mfra", "index"));
+}
+
 TEST_F(SafeSave, PlansWithoutChangingAnything) {
     writeFile(movie, openEndedMedia());
     std::filesystem::permissions(movie, std::filesystem::perms::owner_read);

@@ -16,6 +16,7 @@ zulm_add_tests(ZULMetaDataBridgeTests
   RecordingFileTest
   RecordingRedactionTest
   SafeMovieSaveTest
+  StoredFieldsTest
   StreamRedactionTest
   StreamRetimingTest
   StreamSalvageTest

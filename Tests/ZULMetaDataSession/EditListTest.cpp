@@ -88,12 +88,12 @@ TEST(EditList, RefusesNumbersThatItCouldNotReadBack) {
 TEST(EditList, RefusesDenominatorsWithoutEnd) {
     EditList edits;
     const std::string error = errorOf([&edits] {
-        for (int i = 0; i < 1000; ++i) // the speeds have little in common
+        for (int i = 0; i < 3000; ++i) // the speeds have little in common
             edits.keep(0, 1, Rational::of(1 + 1 / (i + 3.14159)));
     });
     EXPECT_THAT(error, HasSubstr("too many different denominators"));
-    EXPECT_GT(edits.pieces().size(), 100u);
-    EXPECT_LT(edits.pieces().size(), 1000u);
+    EXPECT_GT(edits.pieces().size(), 1000u);
+    EXPECT_LT(edits.pieces().size(), 3000u);
 }
 
 TEST(EditList, AddsUpTenThousandOddPieces) {
@@ -138,6 +138,7 @@ TEST(EditList, ReadsNumbersAndTexts) {
                 ElementsAre("0-3602879701896397/36028797018963968@1=3602879701896397/36028797018963968"));
     EXPECT_THAT(textsOf(listOf(R"({"start": 0, "end": "0.1"})")), ElementsAre("0-1/10@1=1/10"));
     EXPECT_THAT(textsOf(listOf(R"({"start": -0, "end": 1E0})")), ElementsAre("0-1@1=1"));
+    EXPECT_THAT(textsOf(listOf(R"({"start": 0.0e999, "end": 10e-1})")), ElementsAre("0-1@1=1"));
     EXPECT_THAT(textsOf(EditList::read(
                     " \n{\"pieces\" : [ ],\t\"schema_version\": 1.0, \"schema\":\"zulm.e\\u0064its\"}\r\n", "a.json")),
                 IsEmpty());

@@ -25,10 +25,10 @@ Rational number(const std::string& text) {
 
 /// Two to the power of an exponent that is not negative.
 Rational power(int exponent) {
-    Rational result = 1;
-    while (exponent-- > 0)
-        result = result * 2;
-    return result;
+    if (exponent == 0)
+        return 1;
+    const Rational half = power(exponent / 2);
+    return half * half * (exponent % 2 == 0 ? 1 : 2);
 }
 
 TEST(Rational, IsZeroAtFirst) {
@@ -232,7 +232,7 @@ TEST(Rational, IsInfiniteOnlyPastTheLargestDouble) {
 
 TEST(Rational, AgreesWithRealDivision) {
     std::mt19937_64 random(1);
-    for (int i = 0; i < 20000; ++i) {
+    for (int i = 0; i < 5000; ++i) {
         const auto numerator = static_cast<std::int64_t>(random() >> (11 + random() % 53));
         const auto denominator = static_cast<std::int64_t>((random() >> (11 + random() % 53)) | 1);
         const double quotient = static_cast<double>(numerator) / static_cast<double>(denominator);

@@ -96,16 +96,16 @@ TYPED_TEST(RecordingOfKind, HasTheWholeEntriesBeforeATornOne) {
 }
 
 TYPED_TEST(RecordingOfKind, VisitsTheEntriesInTheOrderOfTheStream) {
-    using Kind = typename TypeParam::Kind;
+    using Recorded = typename TypeParam::Kind;
     const MemoryRecording recording(goldenStream<TypeParam>(), "a.dat");
     std::vector<double> times;
-    recording->read<Kind>([&times](double time, const TrackValueOf<Kind>&) {
+    recording->read<Recorded>([&times](double time, const TrackValueOf<Recorded>&) {
         times.push_back(time);
         return true;
     });
     EXPECT_EQ(times.size(), TypeParam::samples().size());
     std::sort(times.begin(), times.end());
-    const auto inTrack = recording->track<Kind>().times();
+    const auto inTrack = recording->track<Recorded>().times();
     EXPECT_TRUE(std::equal(times.begin(), times.end(), inTrack.begin(), inTrack.end()));
 }
 

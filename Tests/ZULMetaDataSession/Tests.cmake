@@ -7,15 +7,21 @@ zulm_add_tests(ZULMetaDataSessionTests
   EditLists/LosslessCutTest
   EditLists/MovieEditListTest
   EditLists/OpenTimelineTest
+  Insights/CameraTest
   Insights/ChaptersTest
   Insights/ClicksTest
+  Insights/CursorPathTest
   Insights/IdleTest
+  Insights/InsightsTest
   Insights/KeyCaptionsTest
+  Insights/ZoomsTest
   PictureTest
   PieceClockTest
   RationalTest
+  RecordingClockTest
   RecordingTest
   RetimingTest
+  SessionWriterTest
   SnapshotTest
   TimeIndexTest
   TimelineTest

@@ -133,7 +133,7 @@ TEST_P(PlayedTimeline, KnowsNothingAtNoTime) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Every, PlayedTimeline, testing::Values(Interpolation::Linear, Interpolation::Held),
-                         [](const auto& info) { return info.param == Interpolation::Linear ? "Linear" : "Held"; });
+                         [](const auto& test) { return test.param == Interpolation::Linear ? "Linear" : "Held"; });
 
 TEST(Timeline, KnowsNothingOfARecordingWithoutStreams) {
     const MemoryRecording recording(movieOf({}));

@@ -162,7 +162,7 @@ ExitCode complainAboutCuts(const AttachResult& attached) {
     return code;
 }
 
-ExitCode complainAboutNoStreams(const AttachOptions& options, ExitCode code) {
+ExitCode complainAboutNothingToAttach(const AttachOptions& options, ExitCode code) {
     if (options.from.empty())
         complain("there is no stream to attach; nothing was written");
     else
@@ -175,7 +175,7 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     requireFile(options.save.movie);
     const Streams streams = takeStreams(options);
     if (streams.sources.empty())
-        return complainAboutNoStreams(options, streams.code);
+        return complainAboutNothingToAttach(options, streams.code);
     std::vector<std::string> inputs = options.streams;
     if (!options.from.empty())
         inputs.push_back(options.from);
@@ -184,7 +184,7 @@ ExitCode attachStreams(const AttachOptions& options, RunReport& report) {
     const std::string folder = std::filesystem::path(movie.name()).parent_path().string();
     const RetimedSources retimed(streams.sources, options.times, duration, folder);
     if (retimed.sources().empty())
-        return complainAboutNoStreams(options, ExitDamaged);
+        return complainAboutNothingToAttach(options, ExitDamaged);
     const auto existing = options.replace ? ExistingStreams::Supersede : ExistingStreams::Refuse;
     const AttachPlan plan = movie.planned([&](const ByteSource& bytes, const std::string& path) {
         AttachPlan examined(streams.sources, existing);

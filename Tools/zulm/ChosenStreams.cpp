@@ -69,13 +69,16 @@ uuid typeNamed(const std::string& kind) {
 }
 
 ExitCode complainAboutNothing(const RecordingFile& recording, const std::vector<std::string>& kinds) {
-    const std::string& name = recording.name();
+    return complainAboutNothing(recording.name(), kinds);
+}
+
+ExitCode complainAboutNothing(const std::string& recording, const std::vector<std::string>& kinds) {
     if (kinds.empty())
-        complain(fmt::format("{}: has no recording metadata; 'zulm salvage {} -o DIR' finds what no reader does", name,
-                             shellWord(name)));
+        complain(fmt::format("{}: has no recording metadata; 'zulm salvage {} -o DIR' finds what no reader does",
+                             recording, shellWord(recording)));
     else
-        complain(fmt::format("{}: has no stream {}; 'zulm info {}' lists what it has", name, fmt::join(kinds, " or "),
-                             shellWord(name)));
+        complain(fmt::format("{}: has no stream {}; 'zulm info {}' lists what it has", recording,
+                             fmt::join(kinds, " or "), shellWord(recording)));
     return ExitNoMetaData;
 }
 

@@ -40,8 +40,11 @@ void requireKinds(const std::string& option, const std::vector<std::string>& kin
 /// The identifier that an option value names.
 ZULMetaData::uuid typeNamed(const std::string& kind);
 
-/// Complains that there is nothing to work on: no metadata at all, or not of `kinds`.
+/// Complain that there is nothing to work on: no metadata at all, or not of `kinds`.
+///@{
 ExitCode complainAboutNothing(const ZULMetaData::RecordingFile& recording, const std::vector<std::string>& kinds);
+ExitCode complainAboutNothing(const std::string& recording, const std::vector<std::string>& kinds);
+///@}
 
 /// Complains if a stream goes on after its first `end` bytes, which is as far as it could be `treated`: "read" or
 /// "searched". Returns how the command ends.

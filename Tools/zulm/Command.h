@@ -26,8 +26,10 @@ using Action = std::function<ExitCode()>;
 void addInfoCommand(CLI::App& app, Action& chosen);
 void addAtomsCommand(CLI::App& app, Action& chosen);
 void addDumpCommand(CLI::App& app, Action& chosen);
+void addInsightsCommand(CLI::App& app, Action& chosen);
 void addDiffCommand(CLI::App& app, Action& chosen);
 void addGrepCommand(CLI::App& app, Action& chosen);
+void addStateCommand(CLI::App& app, Action& chosen);
 void addViewCommand(CLI::App& app, Action& chosen);
 void addVerifyCommand(CLI::App& app, Action& chosen);
 void addAttachCommand(CLI::App& app, Action& chosen);
@@ -42,6 +44,7 @@ void addExtractCommand(CLI::App& app, Action& chosen);
 void addSalvageCommand(CLI::App& app, Action& chosen);
 void addConvertCommand(CLI::App& app, Action& chosen);
 void addDemoCommand(CLI::App& app, Action& chosen);
+void addRecordCommand(CLI::App& app, Action& chosen);
 
 /// One line on standard error, whatever the settings.
 void complain(const std::string& message);

@@ -3,6 +3,7 @@
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Help.h"
 #include "Tools/zulm/Manual.h"
+#include "Tools/zulm/RecordCommand.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
 
@@ -27,7 +28,10 @@ struct CommandGroup {
 
 /// All commands, in the order of the help.
 const std::vector<CommandGroup> s_commandGroups{
-    {"Look", {addInfoCommand, addAtomsCommand, addDumpCommand, addDiffCommand, addGrepCommand, addViewCommand}},
+    {"Record", {addRecordCommand}},
+    {"Look",
+     {addInfoCommand, addAtomsCommand, addDumpCommand, addStateCommand, addInsightsCommand, addDiffCommand,
+      addGrepCommand, addViewCommand}},
     {"Check and rescue", {addVerifyCommand, addRepairCommand, addSalvageCommand}},
     {"Change",
      {addAttachCommand, addStampCommand, addRetimeCommand, addCutCommand, addRedactCommand, addCompactCommand,
@@ -218,6 +222,8 @@ ExitCode runCommandLine(int argc, char** argv) {
                  "zulm");
     Action chosen;
     std::string format;
+    if (argc > 1 && std::string_view(argv[1]) == "record") // whose options are its own, --help and --json too
+        return becomeRecorder({argv + 2, argv + argc});
     define(app, chosen);
     app.add_option("--generate", format)->group("");
     try {

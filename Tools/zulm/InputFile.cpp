@@ -77,6 +77,14 @@ std::unique_ptr<TemporaryFile> newSpoolFile(const std::string& extension) {
     }
 }
 
+template <class Opened>
+void sayWhatItIs(const std::string& path, const std::string& name, const Opened& recording) {
+    const char* container = ZULMetaData::containerName(recording.container());
+    if (isNamedOtherwise(path, recording.container()))
+        warn(fmt::format("{}: is a {} by its contents, whatever its name says", name, container));
+    say(fmt::format("{}: {} with {} streams", name, container, recording.streams().size()));
+}
+
 } // namespace
 
 InputFile::InputFile(const std::string& argument) : name_(argument), path_(argument) {
@@ -93,6 +101,13 @@ InputFile::InputFile(InputFile&&) noexcept = default;
 
 ZULMetaData::RecordingFile InputFile::open() const {
     return openRecording(path_, name_);
+}
+
+ZULMetaData::Recording InputFile::openSession() const {
+    requireFile(path_);
+    ZULMetaData::Recording recording(ZULMetaData::openSource(path_, name_), name_);
+    sayWhatItIs(path_, name_, recording);
+    return recording;
 }
 
 void InputFile::spool() {
@@ -114,10 +129,7 @@ void InputFile::spool() {
 ZULMetaData::RecordingFile openRecording(const std::string& path, const std::string& name) {
     requireFile(path);
     ZULMetaData::RecordingFile recording(path, name);
-    const char* container = containerName(recording.container());
-    if (isNamedOtherwise(path, recording.container()))
-        warn(fmt::format("{}: is a {} by its contents, whatever its name says", recording.name(), container));
-    say(fmt::format("{}: {} with {} streams", recording.name(), container, recording.streams().size()));
+    sayWhatItIs(path, recording.name(), recording);
     return recording;
 }
 

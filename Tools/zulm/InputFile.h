@@ -3,6 +3,7 @@
 // A file to read that was named on the command line, where "-" is standard input.
 
 #include "ZULMetaDataBridge/Source/RecordingFile.h"
+#include "ZULMetaDataSession/Recording.h"
 
 #include <memory>
 #include <string>
@@ -29,6 +30,9 @@ public:
 
     /// Opens it as `openRecording` does. This must outlive the recording.
     ZULMetaData::RecordingFile open() const;
+
+    /// The same for a command that works on tracks.
+    ZULMetaData::Recording openSession() const;
 
 private:
     void spool();

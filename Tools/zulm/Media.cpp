@@ -14,7 +14,6 @@
 namespace Zulm {
 
 using ZULMetaData::Rational;
-using Json = nlohmann::json;
 
 namespace {
 
@@ -73,7 +72,7 @@ void readPackets(const std::string& path, const std::string& name, PictureStream
     stream.frames.erase(std::unique(stream.frames.begin(), stream.frames.end()), stream.frames.end());
 }
 
-void takeStream(const Json& stream, Media& media) {
+void takeStream(const nlohmann::json& stream, Media& media) {
     const std::string type = stream.value("codec_type", "");
     const bool isStill = stream.contains("disposition") && stream["disposition"].value("attached_pic", 0) != 0;
     const int index = stream.at("index");
@@ -122,9 +121,9 @@ Media mediaIn(const std::string& path, const std::string& name) {
           [&text](std::string_view line) { text.append(line) += '\n'; });
     Media media;
     try {
-        const Json document = Json::parse(text);
+        const nlohmann::json document = nlohmann::json::parse(text);
         media.start = rationalIn(document.at("format").value("start_time", "0"));
-        for (const Json& stream : document.at("streams"))
+        for (const nlohmann::json& stream : document.at("streams"))
             takeStream(stream, media);
     } catch (const std::exception& error) { // of a version that speaks otherwise
         throw Failure(fmt::format("{}: what ffprobe says about it is not understood: {}", name, error.what()));

@@ -134,7 +134,7 @@ private:
     /// The bases are rounded, not the lengths, whose differences would add up.
     std::string writtenList() const {
         constexpr std::int64_t microseconds = 1000000;
-        const std::string path = folder_ / "pieces.ffconcat";
+        std::string path = folder_ / "pieces.ffconcat";
         std::ofstream list(path);
         list << "ffconcat version 1.0\n";
         Rational base;

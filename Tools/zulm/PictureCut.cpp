@@ -230,7 +230,7 @@ private:
 std::vector<PictureFile> encodedPieces(const PictureCut& cut, const EditList& edits) {
     Encoder encoder(cut);
     std::vector<PictureFile> files;
-    const std::vector<Rational> bases = edits.bases();
+    const std::vector<Rational>& bases = edits.bases();
     for (std::size_t i = 0; i < bases.size(); ++i)
         files.push_back(encoder.encoded(edits.pieces()[i], bases[i]));
     return files;
@@ -239,7 +239,7 @@ std::vector<PictureFile> encodedPieces(const PictureCut& cut, const EditList& ed
 std::vector<PictureFile> copiedPieces(const PictureCut& cut, const EditList& edits) {
     const Copier copier(cut);
     std::vector<PictureFile> files;
-    const std::vector<Rational> bases = edits.bases();
+    const std::vector<Rational>& bases = edits.bases();
     for (std::size_t i = 0; i < bases.size(); ++i) {
         files.push_back(copier.copied(edits.pieces()[i], fmt::format("{}.{}", i + 1, cut.container)));
         cut.progress(bases[i]);

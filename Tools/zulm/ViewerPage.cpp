@@ -9,6 +9,7 @@
 #include <fmt/core.h>
 
 #include <filesystem>
+#include <utility>
 
 namespace Zulm {
 
@@ -28,10 +29,12 @@ bool isPlainInAddress(char c) {
 Json viewDocument(RecordingFile& recording, const Json& movie) {
     const std::string excerpt = orFileError(recording.name(), [&] { return metaDataExcerpt(recording.parser()); });
     const std::string name = std::filesystem::path(recording.name()).filename().string();
-    return {{"schema", "zulm.view"},           {"schema_version", 1},
-            {"tool_version", ZULM_VERSION},    {"name", validText(name)},
-            {"info", infoDocument(recording)}, {"verify", verifyDocument(recording.name(), recording.validation())},
-            {"metadata", base64(excerpt)},     {"movie", movie}};
+    Json info = infoDocument(recording);
+    info["path"] = validText(name); // the page may go to people who need not know the folder
+    return {{"schema", "zulm.view"},        {"schema_version", 1},
+            {"tool_version", ZULM_VERSION}, {"name", validText(name)},
+            {"info", std::move(info)},      {"verify", verifyDocument(name, recording.validation())},
+            {"metadata", base64(excerpt)},  {"movie", movie}};
 }
 
 std::string relativeAddress(const std::string& file, const std::string& folder) {

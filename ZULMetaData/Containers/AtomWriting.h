@@ -11,7 +11,7 @@
 
 namespace ZULMetaData::detail {
 
-/// Positions in the movie; -1 where the stream had failed.
+/// Positions in the movie; -1 if the stream had failed.
 struct OpenAtom {
     std::int64_t start;
     std::int64_t sizeField;
@@ -20,10 +20,10 @@ struct OpenAtom {
 /// Writes the header at the end of `movie`.
 ZULMETADATA_API OpenAtom beginAtom(std::ofstream& movie, FourCC type);
 
-/// Closes `movie` and gives the length of the atom, counted from an end of -1 where a write has failed.
+/// Closes `movie` and returns the length of the atom, which is counted from an end of -1 if a write has failed.
 ZULMETADATA_API std::uint64_t endAtom(std::ofstream& movie, const OpenAtom& atom);
 
-/// Writes the extended size of an atom; silent where it cannot.
+/// Writes the extended size of an atom. Reports no failure.
 ZULMETADATA_API void writeAtomSize(std::fstream& movie, std::int64_t sizeField, std::uint64_t size);
 
 } // namespace ZULMetaData::detail

@@ -19,7 +19,7 @@ void store(const HeaderBytes& header, MetaDataParser::CachedFileData range, Stre
     found[type] = range;
 }
 
-/// Stores the stream that begins here. False where not even its header is left.
+/// Stores the stream that begins here. Returns false if fewer bytes than its header are left.
 bool storeStream(PositionedInput& input, std::uint64_t length, StreamCache& found) {
     const std::uint64_t offset = input.position();
     HeaderBytes header;
@@ -29,8 +29,8 @@ bool storeStream(PositionedInput& input, std::uint64_t length, StreamCache& foun
     return true;
 }
 
-/// Calls `visit` with every atom from here to `end`. It may read on, and ends the walk by false. An atom without an end
-/// to go on from ends it too.
+/// Calls `visit` with every atom from here to `end`. It may read on, and ends the walk by returning false. An
+/// atom of no size ends it too.
 template <class Visit>
 void walkAtoms(PositionedInput& input, std::uint64_t end, Visit visit) {
     while (input.position() < end && input.position() < input.total()) {
@@ -51,8 +51,8 @@ bool visitStreamAtom(PositionedInput& input, const ContainerItem& atom, StreamCa
     return true;
 }
 
-/// Calls `visit` with every chunk from here to `end`; it ends the walk by false. Returns false if a chunk of size 0
-/// ended the walk.
+/// Calls `visit` with every chunk from here to `end`; it ends the walk by returning false. Returns false if a chunk of
+/// size 0 ended the walk.
 template <class Visit>
 bool walkChunks(PositionedInput& input, std::uint64_t end, Visit visit) {
     while (input.position() < end && input.position() < input.total()) {

@@ -20,8 +20,8 @@ namespace {
 constexpr std::size_t s_copySize = 2048;
 constexpr std::size_t s_streamBufferSize = std::size_t{64} * 1024;
 
-/// The end of the last whole entry, of entries that begin with their size. Where not even the first is whole, all
-/// of it counts, unless its size itself is torn.
+/// Returns the end of the last whole entry of a stream whose entries begin with their size. If not even the first entry
+/// is whole, all of its bytes count, unless its size itself is torn.
 std::uint64_t endOfSizedEntries(detail::PositionedInput& input) {
     std::uint64_t end = s_metaDataHeaderSize;
     while (input.position() < input.total()) {
@@ -38,8 +38,8 @@ std::uint64_t endOfSizedEntries(detail::PositionedInput& input) {
     return end;
 }
 
-/// How much of a stream of `total` bytes, which stands at its start, is worth copying: up to its last whole
-/// entry. Nothing where it has no header.
+/// Returns how much of a stream of `total` bytes, which stands at its start, is copied: the bytes up to the end of its
+/// last whole entry. Nothing if it has no header.
 std::uint64_t endOfWholeEntries(std::istream& stream, std::uint64_t total) {
     detail::PositionedInput input(stream, 0, total);
     MetaDataHeader header;

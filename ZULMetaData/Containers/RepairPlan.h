@@ -20,7 +20,7 @@ namespace ZULMetaData {
 struct RepairChange {
     std::uint64_t offset = 0; ///< in the movie
     std::string before;       ///< what stands there now
-    std::string after;        ///< as long as `before`; or empty, where the file's last bytes are cut off
+    std::string after;        ///< as long as `before`; or empty, if the file's last bytes are cut off
     std::string reason;       ///< one sentence
 };
 
@@ -29,9 +29,9 @@ struct RepairPlan {
     /// An unrepairable movie has a finding, but no changes.
     enum State : std::int32_t { Whole, Repairable, Unrepairable };
 
-    State state = Whole;               ///< repairable where there are changes
+    State state = Whole;               ///< repairable if there are changes
     std::vector<RepairChange> changes; ///< each must be on the disk before the next is made
-    std::string finding;               ///< what is wrong, in one sentence; empty where nothing is
+    std::string finding;               ///< what is wrong, in one sentence; empty if nothing is
     std::uint64_t offset = 0;          ///< of the atom that is wrong
     bool hasLoss = false;              ///< part of the metadata at the end of the movie is missing
     std::string loss;                  ///< what is missing, as a clause about the atom of the finding; else empty

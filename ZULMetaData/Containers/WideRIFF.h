@@ -10,8 +10,8 @@
 namespace ZULMetaData::detail {
 
 /// Returns the first chunk with its true size, which may reach beyond a file that was cut short. Returns nothing if the
-/// chunk has its size in 32 bits. In a file from a pipe the chunk ends where a `ZULM` chunk with a `DATA` chunk in it
-/// begins from which the chunks lead to the end of the file; if there is none, it ends with the file.
+/// chunk has its size in 32 bits. In a file from a pipe the chunk ends before a `ZULM` chunk that holds a `DATA` chunk
+/// and from which chunks lead to the end of the file; if there is none, it ends with the file.
 std::optional<ContainerItem> wideRIFF(const ItemWalk& chunks);
 
 } // namespace ZULMetaData::detail

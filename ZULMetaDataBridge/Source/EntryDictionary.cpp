@@ -70,7 +70,7 @@ template float EntryDictionary::valueAt(std::string_view key) const;
 template std::string EntryDictionary::valueAt(std::string_view key) const;
 template std::shared_ptr<const Image> EntryDictionary::valueAt(std::string_view key) const;
 
-/// Where two threads make them at once, the first to be done has made the entry's own.
+/// If two threads make them at once, the entry keeps those that are finished first.
 const EntryDictionary::Values& EntryDictionary::values() const {
     const Values* values = values_.load(std::memory_order_acquire);
     if (values)

@@ -32,10 +32,10 @@ std::string encodedUTF8(std::uint32_t number);
 /// Returns all bytes as UTF-8, each the character of its number (ISO 8859-1).
 ZULMETADATA_API std::string utf8FromLatin1(std::string_view bytes);
 
-/// The bytes up to the first zero byte. Throws `std::invalid_argument` where they are not UTF-8.
+/// Returns the bytes up to the first zero byte. Throws `std::invalid_argument` if they are not UTF-8.
 ZULMETADATA_API std::string textFromUTF8(const std::string& bytes);
 
-/// The bytes up to the first zero byte, each the character of its number (ISO 8859-1), as UTF-8.
+/// Returns the bytes up to the first zero byte, each the character of its number (ISO 8859-1), as UTF-8.
 ZULMETADATA_API std::string textFromLatin1(const std::string& bytes);
 
 } // namespace ZULMetaData

@@ -331,4 +331,14 @@ StampResult SafeMovieSave::stamp(const std::string& creatorName, const std::stri
     });
 }
 
+AttachResult SafeMovieSave::attachAndStamp(const AttachPlan& plan, const std::string& creatorName,
+                                           const std::string& creatorVersion, FragmentIndex index) const {
+    plan.requireStreams(utf8Path(movie_));
+    return save(movie_, progress_, [&plan, info = recordingInfo(creatorName, creatorVersion), index](Save& work) {
+        AttachResult result = work.attach(plan, FragmentIndex::Leave);
+        result.fragmentIndex = work.stamp(info, index).fragmentIndex;
+        return result;
+    });
+}
+
 } // namespace ZULMetaData

@@ -33,7 +33,7 @@ public:
         Doubtful,   ///< the movie is what it was: a source does not look like a stream, see `StreamSource::unchecked`
     };
 
-    /// `what()` gives both: the file, a colon and the sentence.
+    /// `what()` returns both: the file, a colon and the sentence.
     SaveError(const std::string& file, const std::string& sentence, Reason reason = Reason::Failed)
         : std::runtime_error(file + ": " + sentence), file_(file), sentence_(sentence), reason_(reason) {}
 
@@ -56,7 +56,7 @@ struct AttachedStream {
     std::uint64_t bytes = 0;                              ///< header and whole entries, or all of the source
     std::uint64_t entries = 0;                            ///< all that are whole
     std::uint64_t bytesCut = 0;                           ///< left out, from `bytes` on in the source
-    StreamExtent::End cutBecause = StreamExtent::AtEntry; ///< `AtEntry` where nothing was cut
+    StreamExtent::End cutBecause = StreamExtent::AtEntry; ///< `AtEntry` if nothing was cut
 };
 
 /// What became of the index of a movie's fragments. Players look for that atom (`mfra`) at the end of the file alone.
@@ -155,6 +155,10 @@ public:
     /// stored: on any system the platform's name, "Mac", stands in its place.
     StampResult stamp(const std::string& creatorName, const std::string& creatorVersion,
                       FragmentIndex index = FragmentIndex::Leave) const;
+
+    /// Does what `attach` and then `stamp` do, but if either fails, neither was done.
+    AttachResult attachAndStamp(const AttachPlan& plan, const std::string& creatorName,
+                                const std::string& creatorVersion, FragmentIndex index = FragmentIndex::Leave) const;
 
 private:
     FileLocation movie_;

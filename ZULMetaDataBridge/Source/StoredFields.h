@@ -13,7 +13,6 @@
 
 #include <concepts>
 #include <cstddef>
-#include <functional>
 #include <iterator>
 #include <list>
 #include <string>
@@ -38,7 +37,7 @@ decltype(auto) storedField(const typename Kind::Value& value) {
     else if constexpr (std::is_convertible_v<decltype(field.valueOf), std::string (*)(const KeyStroke&)>)
         return field.valueOf == keyText ? keyNameOf(value).text : field.valueOf(value);
     else
-        return Result(std::invoke(field.valueOf, value));
+        return Result(valueOfField(field, value));
 }
 
 } // namespace detail

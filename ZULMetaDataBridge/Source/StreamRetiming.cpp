@@ -20,7 +20,7 @@ bool isEvent(const uuid& type) {
     return std::find(events.begin(), events.end(), type) != events.end();
 }
 
-/// Where the time stands in every entry; nothing for a stream whose entries nobody here knows.
+/// Returns the offset of the time in every entry. Empty for a stream whose entries nobody here knows.
 std::optional<std::size_t> timeOffsetIn(const MetaDataHeader& header) {
     const std::uint32_t entrySize = entrySizeOf(header);
     if (entrySize >= sizeof(double))

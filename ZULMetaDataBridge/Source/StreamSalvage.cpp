@@ -164,7 +164,7 @@ void StreamSalvage::findReachable() {
 void StreamSalvage::search() {
     const std::size_t blockSize = blockSizeFor(total_);
     std::string block(s_before + s_behind + blockSize, '\0');
-    std::size_t kept = 0; // of the block before, in front of what is read
+    std::size_t kept = 0; // of the block before; they stand before the bytes that are read
     for (std::uint64_t position = 0; position < total_;) {
         const std::size_t size = file_.read(position, {block.data() + kept, blockSize});
         if (size == 0)
@@ -238,7 +238,7 @@ bool StreamSalvage::beginsLikeStream(const SalvagedStream& stream) const {
     return first && canBeEntry(stream.header, entries.bytesOf(*first));
 }
 
-/// False where there is nothing to write of it.
+/// Returns false if there is nothing to write of it.
 bool StreamSalvage::measure(std::size_t index) {
     Candidate& candidate = candidates_[index];
     SalvagedStream& stream = candidate.stream;
@@ -262,7 +262,7 @@ std::uint64_t StreamSalvage::declaredEndOf(const SalvagedStream& stream) const {
     return stream.offset + std::min(present, stream.declaredBytes.value_or(present));
 }
 
-/// Where a stream must end because another one begins.
+/// Returns the position at which a stream must end because another one begins.
 std::uint64_t StreamSalvage::limitOf(std::size_t index) const {
     const bool hasEqualEntries = candidates_[index].stream.header.fixedEntrySize != 0;
     for (std::size_t next = index + 1; next < candidates_.size(); ++next)

@@ -99,7 +99,7 @@ private:
             speeds.push_back(speedOf(effect));
         }
         std::size_t number = 0;
-        list_.moveTo("");
+        list_.moveToFile();
         for (const JsonValue& value : arrayMember(list_, document_, "clips").items) {
             list_.moveTo("clip", ++number);
             const JsonValue& clip = triple(value, "start, end and effect");

@@ -104,7 +104,7 @@ public:
             list_.moveTo("line", line_);
             readLine(takeLine(text));
         }
-        list_.moveTo("");
+        list_.moveToFile();
         if (events_.empty())
             list_.fail("the list has no events of pictures");
         addEvents();
@@ -218,11 +218,11 @@ private:
             return 1;
         }
         const Rational speed = *event.motion / codes_.nominalRate();
-        if (speed.isZero() || (codes_.isWhole() && (ratio == 1 || agrees(event, speed))))
-            return speed;
-        if (!codes_.isWhole() && (ratio != 1 || isUsual(*event.motion)) && agreesRoughly(event, ratio))
-            return ratio;
-        list_.fail("the motion does not say how the length in the source becomes that in the edited movie");
+        const bool isExact = speed.isZero() || (codes_.isWhole() && (ratio == 1 || agrees(event, speed)));
+        const bool isRough = !codes_.isWhole() && (ratio != 1 || isUsual(*event.motion)) && agreesRoughly(event, ratio);
+        if (!isExact && !isRough)
+            list_.fail("the motion does not say how the length in the source becomes that in the edited movie");
+        return isExact ? speed : ratio;
     }
 
     /// Returns whether the length in the source is that of the edited movie at a speed, to a frame.

@@ -28,6 +28,20 @@ struct Decimal {
     /// Returns the number of digits before the point; negative if zeros follow the point.
     std::int64_t places() const { return static_cast<std::int64_t>(digits.size()) + exponent; }
 
+    /// Returns whether a double holds the digits exactly, and the power of ten as well.
+    bool isShort() const { return digits.size() <= 15 && exponent >= -22 && exponent <= 0; }
+
+    /// One division rounds once.
+    double quickNearest() const {
+        double integer = 0;
+        for (const char digit : digits)
+            integer = integer * 10 + (digit - '0');
+        double power = 1;
+        for (std::int64_t i = exponent; i < 0; ++i)
+            power *= 10;
+        return (isNegative ? -integer : integer) / power;
+    }
+
     Rational exact() const {
         if (digits.empty())
             return {};
@@ -60,7 +74,7 @@ Decimal decimalOf(std::string_view number) {
     for (const char c : mantissa)
         if (c >= '0' && c <= '9' && (c != '0' || !decimal.digits.empty()))
             decimal.digits += c;
-    const std::size_t length = decimal.digits.find_last_not_of('0') + 1;
+    const std::size_t length = decimal.digits.empty() ? 0 : decimal.digits.find_last_not_of('0') + 1;
     decimal.exponent += static_cast<std::int64_t>(decimal.digits.size() - length);
     decimal.digits.resize(length);
     return decimal;
@@ -78,7 +92,7 @@ std::optional<Rational> exactDecimal(std::string_view number) {
 std::optional<Rational> nearestDouble(std::string_view number) {
     constexpr std::size_t mostTelling = 800; // two doubles, and what lies half-way between them, differ earlier
     Decimal decimal = decimalOf(number);
-    if (decimal.places() < -s_mostPlaces)
+    if (decimal.digits.empty() || decimal.places() < -s_mostPlaces)
         return Rational();
     if (decimal.places() > s_mostPlaces)
         return std::nullopt;
@@ -87,7 +101,7 @@ std::optional<Rational> nearestDouble(std::string_view number) {
         decimal.digits.resize(mostTelling);
         decimal.digits += '1'; // the rest is not 0
     }
-    const double nearest = decimal.exact().nearest();
+    const double nearest = decimal.isShort() ? decimal.quickNearest() : decimal.exact().nearest();
     return std::isfinite(nearest) ? std::optional(Rational::of(nearest)) : std::nullopt;
 }
 

@@ -27,7 +27,7 @@ void orFail(const ListBuilder& list, Add add) {
 } // namespace
 
 void ListBuilder::fail(const std::string& sentence) const {
-    throw Error(file_, place_.empty() ? sentence : place_ + ": " + sentence);
+    throw Error(file_, kind_ ? kind_ + (' ' + std::to_string(number_)) + ": " + sentence : sentence);
 }
 
 void ListBuilder::requireSource(const std::string& source) {
@@ -96,7 +96,7 @@ std::string_view takeLine(std::string_view& text) {
 
 std::string_view trimmed(std::string_view text) {
     text.remove_prefix(std::min(text.find_first_not_of(s_textBlanks), text.size()));
-    return text.substr(0, text.find_last_not_of(s_textBlanks) + 1);
+    return text.empty() ? text : text.substr(0, text.find_last_not_of(s_textBlanks) + 1);
 }
 
 std::vector<std::string_view> wordsOf(std::string_view line) {

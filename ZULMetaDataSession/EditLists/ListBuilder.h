@@ -18,9 +18,12 @@ public:
 
     const std::string& file() const { return file_; }
 
-    /// Says what is read from now on, such as "line 3". Empty for the file as a whole.
-    void moveTo(std::string place) { place_ = std::move(place); }
-    void moveTo(const char* kind, std::size_t number) { moveTo(std::string(kind) + ' ' + std::to_string(number)); }
+    /// Says what is read from now on, such as "line" and 3.
+    void moveTo(const char* kind, std::size_t number) {
+        kind_ = kind;
+        number_ = number;
+    }
+    void moveToFile() { kind_ = nullptr; } ///< says that the file as a whole is read from now on
 
     [[noreturn]] void fail(const std::string& sentence) const;
 
@@ -41,7 +44,8 @@ public:
 
 private:
     std::string file_;
-    std::string place_;
+    const char* kind_ = nullptr; ///< of the place; null for the file as a whole
+    std::size_t number_ = 0;
     std::optional<std::string> source_;
     EditList edits_;
 };

@@ -94,7 +94,7 @@ std::optional<Rational> timeIn(const ListBuilder& list, std::string_view field) 
     field = trimmed(field);
     if (field.empty())
         return std::nullopt;
-    const auto time = parseEditTime(field);
+    auto time = parseEditTime(field);
     if (!time)
         list.fail(inQuotes(field) + " is no time such as 12.5 or 00:01:30.5");
     return time;

@@ -125,7 +125,7 @@ private:
         AtomFields fields(list_, atoms_, require(child(edits, "elst"), "the track of pictures has no edit list"));
         const auto count = fields.next<std::uint32_t>();
         for (std::uint32_t number = 1; number <= count; ++number) {
-            list_.moveTo("");
+            list_.moveToFile();
             const std::uint64_t length = fields.nextTime();
             const std::int64_t time = fields.nextSignedTime();
             const auto rate = static_cast<std::int32_t>(fields.next<std::uint32_t>());

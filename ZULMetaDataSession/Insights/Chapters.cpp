@@ -24,7 +24,7 @@ struct ChapterMark {
     ChapterSource source;
 };
 
-bool isBlank(std::string_view text) {
+bool isBlankTitle(std::string_view text) {
     return text.find_first_not_of(" \t\r\n") == std::string_view::npos;
 }
 
@@ -70,8 +70,8 @@ std::vector<TextState> steadyOrLastOf(const std::vector<TextState>& states, doub
 }
 
 ChapterMark windowMark(double start, std::string_view title, std::string_view application, std::string_view untitled) {
-    const bool hasApplication = !isBlank(application);
-    if (!isBlank(title))
+    const bool hasApplication = !isBlankTitle(application);
+    if (!isBlankTitle(title))
         return {start, title, application, ChapterSource::WindowTitle};
     return {start, hasApplication ? application : untitled, application,
             hasApplication ? ChapterSource::Application : ChapterSource::Nothing};
@@ -100,9 +100,9 @@ private:
             return;
         const std::vector<TextState> states = statesIn(titles_, start, end);
         std::vector<TextState> steady = steadyOf(states, end, options_.flicker);
-        if (steady.empty() && isBlank(application))
+        if (steady.empty() && isBlankTitle(application))
             steady = steadyOrLastOf(states, end, options_.flicker);
-        if (!isBlank(application) && (steady.empty() || steady.front().start > start))
+        if (!isBlankTitle(application) && (steady.empty() || steady.front().start > start))
             add(start, {}, application); // no title is known yet
         for (const TextState& title : steady)
             add(title.start, title.text, application);
@@ -117,7 +117,7 @@ private:
     std::vector<ChapterMark> marks_;
 };
 
-const ChapterMark* lastAt(double time, const std::vector<ChapterMark>& marks) {
+const ChapterMark* lastMarkAt(double time, const std::vector<ChapterMark>& marks) {
     const auto after = std::upper_bound(marks.begin(), marks.end(), time,
                                         [](double asked, const ChapterMark& mark) { return asked < mark.start; });
     return after == marks.begin() ? nullptr : &*(after - 1);
@@ -127,8 +127,8 @@ const ChapterMark* lastAt(double time, const std::vector<ChapterMark>& marks) {
 std::vector<ChapterMark> slideMarks(const std::vector<TextState>& slides, const std::vector<ChapterMark>& windows) {
     std::vector<ChapterMark> marks;
     for (const TextState& slide : slides) {
-        const ChapterMark* window = lastAt(slide.start, windows);
-        if (!isBlank(slide.text))
+        const ChapterMark* window = lastMarkAt(slide.start, windows);
+        if (!isBlankTitle(slide.text))
             marks.push_back(
                 {slide.start, slide.text, window ? window->application : std::string_view(), ChapterSource::Slide});
         else if (window)
@@ -138,8 +138,8 @@ std::vector<ChapterMark> slideMarks(const std::vector<TextState>& slides, const 
 }
 
 /// Joins both in the order of time. A window that changes together with a slide is left out.
-std::vector<ChapterMark> joined(const std::vector<ChapterMark>& windows, const std::vector<ChapterMark>& slides,
-                                double flicker) {
+std::vector<ChapterMark> joinedMarks(const std::vector<ChapterMark>& windows, const std::vector<ChapterMark>& slides,
+                                     double flicker) {
     const auto isBeside = [flicker](const ChapterMark& slide, double time) {
         const double apart = std::max(slide.start, time) - std::min(slide.start, time);
         return slide.source == ChapterSource::Slide && (apart == 0 || apart < flicker);
@@ -231,7 +231,7 @@ std::vector<Chapter> chaptersOf(const Track<TopmostWindowTitleKind>& titles,
     const std::vector<ChapterMark> windows = WindowMarks(titles, options).read(applications, duration);
     const std::vector<TextState> steadySlides =
         steadyOrLastOf(statesIn(slides, 0, duration), duration, options.flicker);
-    const std::vector<ChapterMark> marks = joined(windows, slideMarks(steadySlides, windows), options.flicker);
+    const std::vector<ChapterMark> marks = joinedMarks(windows, slideMarks(steadySlides, windows), options.flicker);
     return ChapterMaker(marks, duration, options.least).make();
 }
 

@@ -41,7 +41,7 @@ struct Chapter {
 /// A chapter begins when a slide, the title of the window on top, or the application changes. Titles that consist of
 /// white space are left out: the chapter then has the name of the application. A title that flickers is passed over,
 /// and the one before it goes on; if all titles of an application flicker, the chapter has the name of the application.
-/// Of a slide and a window that change together, the slide counts. Changes that follow one another too quickly for
+/// If a slide and a window change together, the slide counts. Changes that follow one another too quickly for
 /// chapters of their own share one, which has the title that held longest. Takes O(n log n) time and O(n) memory.
 ZULMETADATA_API std::vector<Chapter> chaptersOf(const Track<TopmostWindowTitleKind>& titles,
                                                 const Track<TopmostAppNameKind>& applications,

@@ -9,15 +9,6 @@ namespace ZULMetaData {
 
 namespace {
 
-/// Returns the times at which the cursor was somewhere else than before.
-std::vector<double> movesOf(const Track<CursorLocationKind>& positions) {
-    std::vector<double> times;
-    for (std::size_t i = 0; i < positions.size(); ++i)
-        if (i == 0 || positions.values()[i] != positions.values()[i - 1])
-            times.push_back(positions.times()[i]);
-    return times;
-}
-
 /// Returns the times at which a button went down or up.
 std::vector<double> pressesAndReleasesOf(const Track<CursorActionKind>& actions) {
     std::vector<double> times;
@@ -27,7 +18,7 @@ std::vector<double> pressesAndReleasesOf(const Track<CursorActionKind>& actions)
     return times;
 }
 
-std::vector<double> merged(std::span<const double> left, std::span<const double> right) {
+std::vector<double> mergedTimes(std::span<const double> left, std::span<const double> right) {
     std::vector<double> times;
     times.reserve(left.size() + right.size());
     std::merge(left.begin(), left.end(), right.begin(), right.end(), std::back_inserter(times));
@@ -41,16 +32,25 @@ std::vector<IdleSpan> idleSpansOf(const Track<CursorLocationKind>& positions, co
                                   double duration, const IdleOptions& options) {
     if (positions.empty() && actions.empty() && keys.empty() && scrolling.empty())
         return {};
-    const std::vector<double> input = merged(merged(keys.times(), scrolling.times()), pressesAndReleasesOf(actions));
+    const std::vector<double> input =
+        mergedTimes(mergedTimes(keys.times(), scrolling.times()), pressesAndReleasesOf(actions));
     std::vector<IdleSpan> spans;
     double last = 0;
     const auto endAt = [&](double time) {
-        if (time > last && time - last >= options.least)
-            spans.push_back({last, time});
-        last = std::max(last, time);
+        const double end = std::min(time, duration);
+        if (end > last && end - last >= options.least)
+            spans.push_back({last, end});
+        last = std::max(last, end);
     };
-    for (const double time : merged(movesOf(positions), input))
-        endAt(std::min(time, duration));
+    auto next = input.begin();
+    for (std::size_t i = 0; i < positions.size(); ++i) {
+        if (i > 0 && positions.values()[i] == positions.values()[i - 1])
+            continue; // the cursor did not move
+        for (; next != input.end() && *next <= positions.times()[i]; ++next)
+            endAt(*next);
+        endAt(positions.times()[i]);
+    }
+    std::for_each(next, input.end(), endAt);
     endAt(duration);
     return spans;
 }

@@ -13,10 +13,15 @@ entries. Open the file again after it changes. A problem with a file raises an `
 
 from __future__ import annotations
 
+import importlib
+import json
 import os
 from collections.abc import Iterable, Iterator, Mapping
 from types import TracebackType
-from typing import Any, Union, cast
+from typing import Any, Literal, Union, cast
+
+import numpy as np
+import numpy.typing as npt
 
 from . import _core
 from ._core import (
@@ -42,6 +47,7 @@ from ._entries import Entries as _Entries
 from ._entries import Records as _Records
 from ._entries import records_of as _records_of
 from ._kinds import Kind
+from ._tables import table_of as _table_of
 
 __all__ = [
     "Attached",
@@ -66,6 +72,7 @@ __all__ = [
     "recorded_kinds",
     "repair",
     "stamp",
+    "to_pandas",
     "verify",
     "write_stream",
 ]
@@ -87,6 +94,7 @@ class Recording(Mapping[Kind, _Records]):
         self._file = _core.RecordingFile(os.fspath(path))
         self._decodable = {cast(Kind, stream.kind): stream for stream in self._file.streams if stream.is_decodable}
         self._closed = False
+        self._session: _core.Session | None = None
         self.path = path
 
     @property
@@ -113,15 +121,63 @@ class Recording(Mapping[Kind, _Records]):
         """Ends the use of the recording: asking for entries raises a `ValueError` afterwards. May be called more than
         once. Arrays that were read stay valid. No file is kept open before this either."""
         self._closed = True
+        self._session = None
 
     @property
     def closed(self) -> bool:
         """True after `close`."""
         return self._closed
 
-    def __getitem__(self, kind: Kind) -> _Records:
+    def _require_open(self) -> None:
         if self._closed:
             raise ValueError(f"{os.fspath(self.path)}: the recording is closed")
+
+    def _opened(self) -> _core.Session:
+        """Returns the recording as the session layer knows it. It keeps the tracks that it has read."""
+        self._require_open()
+        if self._session is None:
+            self._session = _core.Session(os.fspath(self.path))
+        return self._session
+
+    def track(self, kind: Kind) -> _Records:
+        """Returns the entries of a kind with a finite time, in the order of their times. Entries at the same time keep
+        the order of the stream."""
+        entries = self[kind]
+        entries = entries[np.isfinite(entries["time"])]
+        return entries[np.argsort(entries["time"], kind="stable")]
+
+    def at(self, times: npt.ArrayLike, *, interpolate: Literal["linear", "none"] = "linear") -> _Records:
+        """Returns what holds at each of these times, in seconds: one record for each, with the fields `x` and `y` of the
+        cursor, `cursor_id`, `hotspot_x`, `hotspot_y` and `picture` of what it looks like, `opacity`, `buttons`,
+        `modifiers`, `window_x` to `window_height`, `title`, `application`, `slide_title`, `slide_text`,
+        `slide_comment`, `hover_x` to `hover_height`, `region_x` to `region_height`, `scale` and `cpu`.
+
+        A number that is not known is not-a-number, and anything else None. Buttons and modifiers are names with "+"
+        between two, such as "shift+ctrl". With "linear" the cursor moves between two entries, but rests while nothing
+        was recorded; with "none" it is where the last entry says.
+        """
+        if interpolate not in ("linear", "none"):
+            raise ValueError(f"interpolate is 'linear' or 'none', not {interpolate!r}")
+        asked = np.atleast_1d(np.asarray(times, dtype=np.float64)).ravel()
+        return _table_of(self._opened().states(asked, interpolate == "linear"))
+
+    def insights(self, name: str, **parameters: float) -> _Records:
+        """Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path" or
+        "camera", with one record for each. Parameters change the defaults of the C++ library, by their names in lower
+        case with underscores, such as `least=3`. Another name raises a `ValueError`."""
+        return _table_of(self._opened().insight(name, {key: float(value) for key, value in parameters.items()}))
+
+    def retime(self, edits: str | Mapping[str, Any]) -> _Records:
+        """Returns the streams for a movie that was cut by an edit list: the JSON document, or the mapping that it
+        describes. A record has the `kind` and all `bytes` of a stream. If `is_copied` is 0, `moved`, `carried`,
+        `added` and `left_out` count its entries. An impossible list raises a `ValueError`."""
+        document = edits if isinstance(edits, str) else json.dumps(edits)
+        return _table_of(self._opened().retimed(document))[
+            ["kind", "bytes", "is_copied", "moved", "carried", "added", "left_out"]
+        ]
+
+    def __getitem__(self, kind: Kind) -> _Records:
+        self._require_open()
         return self._decodable[kind].read()
 
     def __contains__(self, kind: object) -> bool:
@@ -146,6 +202,14 @@ class Recording(Mapping[Kind, _Records]):
 
     def __reduce__(self) -> tuple[type[Recording], tuple[str]]:
         return type(self), (os.path.abspath(os.fspath(self.path)),)
+
+
+def to_pandas(records: _Records) -> Any:
+    """Returns records as a `pandas.DataFrame`, with the time in seconds as its index if they have one. Raises an
+    `ImportError` if pandas is not installed."""
+    pandas = importlib.import_module("pandas")
+    frame = pandas.DataFrame({name: records[name] for name in records.dtype.names or ()})
+    return frame.set_index("time") if "time" in frame else frame
 
 
 _SOURCE_TYPES = (str, os.PathLike, RecordedStream, Recording)

@@ -74,12 +74,12 @@ test('gives columns of the types that are promised', async () => {
 test('joins keys into the captions that the tool writes', async () => {
   const recording = await open(movie);
   for (const showsKeys of [true, false]) {
-    const { time, columns } = recording.keyCaptions(showsKeys);
+    const { time, columns } = recording.insights('captions', { shows_keys: showsKeys });
     assert.ok(time.length > 0 && time.every((at, index) => index === 0 || at >= time[index - 1]));
     const texts = new Map();
     columns.label.forEach((label, index) => {
       const first = columns.first[index];
-      const joint = index === first || (columns.isTyped[index - 1] && columns.isTyped[index]) ? '' : ' ';
+      const joint = index === first || (columns.is_typed[index - 1] && columns.is_typed[index]) ? '' : ' ';
       texts.set(first, (texts.get(first) ?? '') + joint + label);
       assert.ok(columns.end[index] > time[index]);
     });
@@ -158,9 +158,9 @@ test('says in words what it cannot do', async () => {
   assert.throws(() => recording.info(), said('Mine.mp4: is closed'));
 });
 
-test('says that there are no keys', async () => {
+test('has no captions without keys', async () => {
   const recording = await open(streams.find((path) => path.endsWith('/slideText.dat')));
-  assert.throws(() => recording.keyCaptions(), { name: 'ZulmError', message: /holds no stream keyboardAction$/ });
+  assert.equal(recording.insights('captions').time.length, 0);
 });
 
 test('keeps what it gave out when it is closed', async () => {

@@ -6,7 +6,7 @@ import { tmpdir } from 'node:os';
 import { extname, join } from 'node:path';
 import { pathToFileURL } from 'node:url';
 
-const { ZULM_PATH: tool, ZULM_PACKAGE: folder, ZULM_TEST_DATA: data } = process.env;
+const { ZULM_PATH: tool, ZULM_PACKAGE: folder, ZULM_TEST_DATA: data, ZULM_SESSION_NUMBERS: numbers } = process.env;
 
 export const packageFolder = folder;
 export const load = (name) => import(pathToFileURL(join(folder, name)));
@@ -49,3 +49,10 @@ export function damagedFiles() {
 }
 
 export const bytesOf = (file) => new Uint8Array(readFileSync(file));
+
+/** What the C++ library computes from a recording. */
+export function sessionNumbers(file, edits) {
+  const { stdout, stderr, status } = spawnSync(numbers, [file, edits], { encoding: 'utf8', maxBuffer: 1 << 28 });
+  if (status !== 0) throw new Error(stderr);
+  return JSON.parse(stdout);
+}

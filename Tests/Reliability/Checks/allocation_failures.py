@@ -106,6 +106,7 @@ def commands(context):
         Command(["verify", "--json", "r.mp4"], torn),
         Command(["diff", "r.mp4", "t.mp4"], {"r.mp4": movie, "t.mp4": torn["r.mp4"]}),
         Command(["grep", "-i", "e", "r.mp4"], recorded),
+        Command(["state", "r.mp4", "--at", "1,2", "--json"], recorded),
         Command(["extract", "r.mp4", "-o", "out"], recorded),
         Command(["salvage", "r.mp4", "-o", "out"], torn),
         Command(["redact", "r.mp4", "--keys", "-o", "o.mp4"], recorded),

@@ -24,6 +24,7 @@ DISK = 64 * 1024
 PAGE = 4096
 FULL = "No space left on device"
 ENTRIES = 8
+SESSIONS = ("session", "one-session")  # what the recorder is told to do
 KINDS = ("cursorLocation", "keyboardAction", "slideTitles", "cursorImage")
 
 
@@ -95,7 +96,7 @@ def problem_of(case, got, wanted):
     return f"leaves {sorted(new)}" if new else ""
 
 
-def check_level(context, folder, streams, level, usual_session, result, ends):
+def check_level(context, folder, streams, level, sessions, result, ends):
     def note(name, got, problem):
         result.cases += 1
         result.crashed += got is None
@@ -103,7 +104,7 @@ def check_level(context, folder, streams, level, usual_session, result, ends):
         if got is None or problem:
             ended = f"ended {got.code}: {got.errors!r}" if got else ""
             result.failures.append(f"{name} at {level} bytes: {problem or 'crashes or hangs'}; {ended}")
-        elif name == "record":
+        elif name in SESSIONS:
             ends.add((name, b" 0 " in got.output))
         else:
             ends.add((name, got.code != 0))
@@ -111,11 +112,11 @@ def check_level(context, folder, streams, level, usual_session, result, ends):
     for case, wanted in cases(streams, level % PAGE):
         got = perform(folder, case, context.zulm, level)
         note(case.name, got, problem_of(case, got, wanted) if got else "")
-    session, usual = usual_session
-    got = perform(folder, session, context.program("recorder"), level)
-    if got:
-        got = dataclasses.replace(got, files={pathlib.Path(n).name: contents for n, contents in got.files.items()})
-    note("record", got, damage_of(session, Fault("enospc"), got, usual) if got else "")
+    for session, usual in sessions:
+        got = perform(folder, session, context.program("recorder"), level)
+        if got:
+            got = dataclasses.replace(got, files={pathlib.Path(n).name: contents for n, contents in got.files.items()})
+        note(session.name, got, damage_of(session, Fault("enospc"), got, usual) if got else "")
 
 
 def run_inside(context):
@@ -123,22 +124,26 @@ def run_inside(context):
     folder = context.folder
     disk = folder / "disk"
     disk.mkdir()
-    session = Case("record", ["session", "disk", str(ENTRIES)], {"disk/Movie.mp4": movie_ending_at(0)[0]})
+    sessions = []
+    for name in SESSIONS:
+        session = Case(name, [name, "disk", str(ENTRIES)], {"disk/Movie.mp4": movie_ending_at(0)[0]})
+        usual = perform(folder, session, context.program("recorder"), 0)
+        usual.files = {pathlib.Path(path).name: contents for path, contents in usual.files.items()}
+        sessions.append((session, usual))
     streams = {kind: shortened(stream, 5000) for kind, stream in demo_streams(context).items() if kind in KINDS}
     shutil.rmtree(folder / "demo")
-    usual = perform(folder, session, context.program("recorder"), 0)
-    usual.files = {pathlib.Path(name).name: contents for name, contents in usual.files.items()}
     subprocess.run(["mount", "-t", "tmpfs", "-o", f"size={DISK}", "tmpfs", disk], check=True)
     result, ends = Result(), set()
     levels = 4096 if context.full else 16
     for number in range(levels):
         level = DISK * number // levels + (0 if context.full else number * 273 % PAGE)
-        check_level(context, folder, streams, level, (session, usual), result, ends)
+        check_level(context, folder, streams, level, sessions, result, ends)
     for name in ("attach a copy", "attach", "stamp", "extract", "redact"):
         if {(name, False), (name, True)} - ends:
             result.failures.append(f"{name}: not both with and without room")
-    if ("record", True) not in ends:  # 17 files need a page each, and there are 16
-        result.failures.append("record: always finds room")
+    for name in SESSIONS:
+        if (name, True) not in ends:  # 17 files need a page each, and there are 16
+            result.failures.append(f"{name}: always finds room")
     return result
 
 

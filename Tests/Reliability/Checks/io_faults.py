@@ -43,6 +43,7 @@ def cases(streams):
         Case("atoms", ["atoms", "Recording.mp4"], whole),
         Case("dump", ["dump", "Recording.mp4"], whole),
         Case("grep", ["grep", "e", "Recording.mp4"], whole),
+        Case("state", ["state", "Recording.mp4", "--at", "1"], whole),
         Case("diff", ["diff", "Recording.mp4", "Broken.mp4"], whole | damaged),
         Case("verify", ["verify", "Recording.mp4"], whole),
         Case("extract", ["extract", "Recording.mp4", "-o", "out"], whole),
@@ -180,6 +181,7 @@ def run(context):
         for case in cases(small_streams(context)):
             check_case(context, root, case, context.zulm, problem_of, result)
         entries = "20" if context.full else "2"
-        session = Case("recording", ["session", ".", entries], {"Movie.mp4": OPEN_MOVIE})
-        check_case(context, root, session, context.program("recorder"), damage_of, result)
+        for name in ("session", "one-session"):
+            session = Case(f"recording a {name}", [name, ".", entries], {"Movie.mp4": OPEN_MOVIE})
+            check_case(context, root, session, context.program("recorder"), damage_of, result)
     return result

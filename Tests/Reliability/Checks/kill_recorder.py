@@ -89,11 +89,24 @@ def check_attached(context, number, folder, streams, result):
             result.failures.append(f"run {number}: {name}: {right[name]} entries right in the movie")
 
 
+def check_abandoned(context, number, folder, streams, result):
+    """A session that was killed is found, with what each of its streams holds."""
+    found = run_program([context.program("recorder"), "abandoned", folder]).stdout.decode().split("\n")[:-1]
+    ends = {name: entry_ends(stream) if len(stream) >= HEADER else [0] for name, stream in streams.items()}
+    expected = [f"{name} {len(ends[name]) - 1} {len(stream) - ends[name][-1]}" for name, stream in streams.items()
+                if (folder / name).exists()]
+    if found != expected:
+        result.lost += 1
+        result.failures.append(f"run {number}: the session holds {expected}, and {found} was found")
+
+
 def check_run(context, number, folder, flushed, result):
     right = right_entries(context, folder)
     streams = {name: (folder / name).read_bytes() if (folder / name).exists() else b"" for name in right}
     for place, (name, stream) in enumerate(streams.items()):
         check_entries(number, name, stream, flushed.get(place, 0), right[name], result)
+    if (folder / "session.lock").exists():
+        check_abandoned(context, number, folder, streams, result)
     begun = {name: stream for name, stream in streams.items() if len(stream) >= HEADER}
     if not begun:
         return 0
@@ -109,7 +122,7 @@ def run_once(context, number, chance, result):
     with fast_folder() as name:
         folder = type(context.folder)(name)
         waits = number % 10 != 0
-        ended, flushed = record_and_kill(context, folder, chance.choice(("flushed", "buffered")),
+        ended, flushed = record_and_kill(context, folder, chance.choice(("flushed", "buffered", "session")),
                                          chance.uniform(0, LONGEST), waits)
         if ended != -signal.SIGKILL or (waits and not flushed):
             result.crashed += 1

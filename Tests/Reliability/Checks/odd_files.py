@@ -78,6 +78,7 @@ READERS = {
     "attach --from": ["attach", "Movie.mp4", "--from", "{}", "-o", "out.mp4"],
     "repair --dry-run": ["repair", "--dry-run", "{}"],
     "grep": ["grep", ".", "{}"],
+    "state": ["state", "{}", "--at", "1"],
     "view": ["view", "{}", "--page", PAGE, "-o", "out.html"],
 }
 CHANGERS = {
@@ -389,7 +390,7 @@ def check_limited_recorder(recorder, top, is_ignored, result):
 
 PRINTING = {
     **{name: [argument.replace("{}", "Recording.mp4") for argument in READERS[name]]
-       for name in ("info", "dump", "verify", "atoms", "convert", "grep")},
+       for name in ("info", "dump", "verify", "atoms", "convert", "grep", "state")},
     **{f"{name} --json": [name, "--json", "Recording.mp4"] for name in ("info", "verify", "atoms")},
     "repair --dry-run": ["repair", "--dry-run", "Movie.mp4"],
     "salvage --json": ["salvage", "--json", "Recording.mp4", "-o", "out"],

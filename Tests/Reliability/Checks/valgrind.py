@@ -87,7 +87,8 @@ def commands(context):
     (folder / "page.html").write_bytes(b"<head></head>")
     return folder, [
         ["info", "r.mp4"], ["atoms", "r.mp4"], ["dump", "--format", "ndjson", "r.mp4"], ["verify", "torn.mp4"],
-        ["grep", "e", "r.mp4"], ["extract", "r.mp4", "-o", "out"], ["salvage", "torn.mp4", "-o", "rescued"],
+        ["grep", "e", "r.mp4"], ["state", "torn.mp4", "--at", "1,2"], ["extract", "r.mp4", "-o", "out"],
+        ["salvage", "torn.mp4", "-o", "rescued"],
         ["redact", "r.mp4", "--keys", "-o", "redacted.mp4"], ["attach", "m.mp4", "a.dat", "-o", "attached.mp4"],
         ["repair", "m.mp4", "-o", "repaired.mp4"], ["diff", "r.mp4", "torn.mp4"],
         ["stamp", "m.mp4", "-o", "s.mp4", "--creator", "C", "--creator-version", "1"],

@@ -218,6 +218,8 @@ FOPEN(fopen64)
     }
 MAKE_TEMPORARY(mkstemps)
 MAKE_TEMPORARY(mkstemps64)
+MAKE_TEMPORARY(mkostemp)
+MAKE_TEMPORARY(mkostemp64)
 
 int mkdir(const char* path, mode_t mode) {
     return attempt(Operation::Make, -1, [=] { return NEXT(mkdir)(path, mode); });

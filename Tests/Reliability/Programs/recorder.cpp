@@ -1,21 +1,28 @@
 // Records with every writer as fast as it can until it is killed, or says what such a recording holds.
 //
-//     recorder record FOLDER DESCRIPTOR flushed|buffered
+//     recorder record FOLDER DESCRIPTOR flushed|buffered|session
 //     recorder count FILE|FOLDER
 //     recorder session FOLDER ENTRIES
+//     recorder one-session FOLDER ENTRIES
+//     recorder abandoned FOLDER
 //
 // `record` writes to the descriptor, after each flush of a stream has returned, the stream's place among the kinds and
 // how many of its entries are on the disk: two 32-bit numbers. `buffered` leaves flushing to the file buffer but for
-// every 500th entry, so that a stream is often torn in the middle of an entry. `count` prints, for every kind, how
-// many entries from the first on are what was recorded. `session` records so many entries of every kind, repairs the
-// folder's Movie.mp4, appends the streams to it and reads them there. It prints for every kind whether its writer was
-// healthy in the end, how many entries it says that it wrote, and how many are right in the stream file and the movie.
+// every 500th entry, so that a stream is often torn in the middle of an entry. `session` writes one session that
+// flushes every 5 ms, and tells of entries that are older than this. `count` prints, for every kind, how many entries
+// from the first on are what was recorded. `session` records so many entries of every kind, repairs the folder's
+// Movie.mp4, appends the streams to it and reads them there. It prints for every kind whether its writer was healthy in
+// the end, how many entries it says that it wrote, and how many are right in the stream file and the movie.
+// `one-session` does the same with one session that saves itself. `abandoned` prints for every stream of the session in
+// the folder how many whole entries it has, and how many bytes follow them.
 
 #include "Tests/Reliability/Programs/Observations.h"
 
 #include "ZULMetaDataBridge/Source/Validation/MetaDataValidator.h"
+#include "ZULMetaDataSession/SessionWriter.h"
 
 #include <array>
+#include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -74,6 +81,41 @@ RecordOne recorderOf(const std::string& folder, bool isBuffered) {
                 reporter.tell(stream, number + 1);
 }
 
+template <class R>
+void recordInto(SessionWriter& session, std::uint32_t number) {
+    using Kind = typename R::Kind;
+    if constexpr (std::same_as<Kind, SystemDataKind>)
+        session.write<Kind>(ProcessInfo::current());
+    else
+        session.write<Kind>(timeOf(number).seconds(), valueOf<Kind>(number));
+}
+
+/// An entry is on the disk once any entry is written the interval after it: all of a round are when the next one is
+/// written whose start is so much later than the round's end.
+[[noreturn]] void recordSessionForever(const std::string& folder, const Reporter& reporter) {
+    constexpr auto interval = std::chrono::milliseconds(5);
+    using Clock = std::chrono::steady_clock;
+    SessionOptions options;
+    options.flushInterval = interval;
+    SessionWriter session(folder, options);
+    std::vector<Clock::time_point> ends;
+    std::uint32_t safe = 0;
+    for (std::uint32_t number = 0;; ++number) {
+        const auto start = Clock::now();
+        forEachRecorded([&]<class R>() { recordInto<R>(session, number); });
+        ends.push_back(Clock::now());
+        const std::uint32_t before = safe;
+        while (ends[safe] + interval <= start)
+            ++safe;
+        std::uint32_t stream = 0;
+        forEachRecorded([&]<class R>() {
+            if (safe > before)
+                reporter.tell(stream, isOneShot<R>() ? 1 : safe);
+            ++stream;
+        });
+    }
+}
+
 void count(const std::string& path) {
     const bool isFolder = std::filesystem::is_directory(path);
     forEachRecorded([&]<class R>() {
@@ -84,8 +126,8 @@ void count(const std::string& path) {
 }
 
 struct Outcome {
-    bool isHealthy;
-    std::uint64_t written;
+    bool isHealthy = false;
+    std::uint64_t written = 0;
 };
 
 template <class R>
@@ -107,6 +149,19 @@ bool isSound(const std::string& movie) {
     }
 }
 
+/// Prints what became of the streams, in the order of `AllRecorded`.
+void printOutcomes(const std::string& folder, const std::vector<Outcome>& outcomes) {
+    const std::string movie = folder + "/Movie.mp4";
+    const bool isReadable = isSound(movie);
+    auto outcome = outcomes.begin();
+    forEachRecorded([&]<class R>() {
+        std::printf("%s %d %lu %u %u\n", fileName<R>().c_str(), outcome->isHealthy,
+                    static_cast<unsigned long>(outcome->written), rightEntries<R>(folder + "/" + fileName<R>()),
+                    isReadable ? rightEntries<R>(movie) : 0);
+        ++outcome;
+    });
+}
+
 void session(const std::string& folder, std::uint32_t entries) {
     const std::string movie = folder + "/Movie.mp4";
     std::vector<Outcome> outcomes;
@@ -121,26 +176,52 @@ void session(const std::string& folder, std::uint32_t entries) {
     } catch (const std::runtime_error& error) { // of an entry of size 0 alone
         std::printf("append: %s\n", error.what());
     }
-    const bool isReadable = isSound(movie);
-    auto outcome = outcomes.begin();
-    forEachRecorded([&]<class R>() {
-        std::printf("%s %d %lu %u %u\n", fileName<R>().c_str(), outcome->isHealthy,
-                    static_cast<unsigned long>(outcome->written), rightEntries<R>(folder + "/" + fileName<R>()),
-                    isReadable ? rightEntries<R>(movie) : 0);
-        ++outcome;
-    });
+    printOutcomes(folder, outcomes);
+}
+
+void oneSession(const std::string& folder, std::uint32_t entries) {
+    const std::string movie = folder + "/Movie.mp4";
+    std::vector<Outcome> outcomes(RecordedKinds::size);
+    try {
+        SessionWriter session(folder);
+        std::size_t stream = 0;
+        forEachRecorded([&]<class R>() {
+            for (std::uint32_t number = 0; number < entries; ++number)
+                recordInto<R>(session, number);
+        });
+        session.finish();
+        forEachRecorded([&]<class R>() {
+            outcomes[stream++] = {session.isHealthy(), session.entriesWritten(R::Kind::type)};
+        });
+        session.saveInto(movie, "Recorder", "1.0");
+    } catch (const Error&) { // the folder or the movie cannot be used
+    }
+    printOutcomes(folder, outcomes);
+}
+
+void abandoned(const std::string& folder) {
+    for (const AbandonedSession& session : SessionWriter::abandoned(folder))
+        for (const SessionStream& stream : session.streams())
+            std::printf("%s %lu %lu\n", stream.file.filename().c_str(), static_cast<unsigned long>(stream.entries),
+                        static_cast<unsigned long>(stream.tornBytes));
 }
 
 } // namespace
 
 int main(int argc, char** argv) {
     const std::string command = argc > 2 ? argv[1] : "";
+    if (command == "record" && argc == 5 && std::string(argv[4]) == "session")
+        recordSessionForever(argv[2], Reporter(std::atoi(argv[3])));
     if (command == "record" && argc == 5)
         recordForever(argv[2], Reporter(std::atoi(argv[3])), std::string(argv[4]) == "buffered");
     if (command == "count" && argc == 3)
         count(argv[2]);
     else if (command == "session" && argc == 4)
         session(argv[2], static_cast<std::uint32_t>(std::atoi(argv[3])));
+    else if (command == "one-session" && argc == 4)
+        oneSession(argv[2], static_cast<std::uint32_t>(std::atoi(argv[3])));
+    else if (command == "abandoned" && argc == 3)
+        abandoned(argv[2]);
     else
         return 2;
     return 0;

@@ -4,6 +4,7 @@ import assert from 'node:assert/strict';
 import { readFileSync, writeFileSync } from 'node:fs';
 import { join } from 'node:path';
 import { test } from 'node:test';
+import { attached, positionsOf } from './numbered.mjs';
 import { axeSource, emptyPage, folder, open, opened, ready, recordedSession, seek } from './support.mjs';
 
 const recording = recordedSession();
@@ -49,14 +50,38 @@ for (const [name, { path, show }] of Object.entries(views))
     }
   });
 
-for (const size of [
-  [360, 740],
-  [768, 1024],
-  [1280, 800],
-  [3840, 2160],
+/// Controls that are cut by the edge of the screen, or that lie below another thing; those of the table scroll with it.
+function hiddenControls() {
+  const width = document.documentElement.clientWidth;
+  const controls = [...document.querySelectorAll('button, select, input, [role="tab"]')];
+  return controls
+    .filter((element) => element.checkVisibility({ visibilityProperty: true }) && element.getBoundingClientRect().width > 0)
+    .flatMap((element) => {
+      element.scrollIntoView({ block: 'center', inline: 'nearest' });
+      const { left, right, top, bottom, width: wide, height } = element.getBoundingClientRect();
+      const points = [0.15, 0.5, 0.85].map((part) => document.elementFromPoint(left + wide * part, (top + bottom) / 2));
+      const isCovered = points.some((seen) => !seen || !(element.contains(seen) || seen.contains(element)));
+      const isSquare = !element.matches('.is-icon') || Math.abs(wide - height) < 2;
+      const isCut = left < 0 || right > width + 0.5 || element.scrollWidth > element.clientWidth + 1;
+      const name = element.id || element.getAttribute('aria-label') || element.textContent;
+      return isCovered || !isSquare || (isCut && !element.matches('input')) ? [`${name} at ${left} to ${right}, ${top}`] : [];
+    });
+}
+
+for (const [size, text] of [
+  [[360, 740], 100],
+  [[500, 900], 100],
+  [[768, 1024], 100],
+  [[1024, 768], 100],
+  [[1280, 800], 100],
+  [[3840, 2160], 100],
+  [[1440, 900], 200],
+  [[720, 450], 100], // 1440 by 900, everything twice as large
+  [[500, 900], 200],
 ])
-  test(`nothing is wider than the screen at ${size.join(' by ')}`, async () => {
+  test(`nothing is cut or covered at ${size.join(' by ')}, text at ${text} %`, async () => {
     const { page, close } = await open(recording.page, { size });
+    await page.evaluate((text) => (document.documentElement.style.fontSize = text === 100 ? '' : `${(16 * text) / 100}px`), text);
     await opened(page);
     await ready(page);
     const { width, stage } = await page.evaluate(() => ({
@@ -64,13 +89,71 @@ for (const size of [
       stage: document.getElementById('frame').getBoundingClientRect().width,
     }));
     assert.ok(width <= size[0], `${width} pixels`);
-    assert.ok(stage > size[0] * 0.3, `the movie is ${stage} pixels wide`);
-    for (const button of await page.locator('.transport > button:visible').all()) {
-      const box = await button.boundingBox();
-      assert.ok(box.x >= 0 && box.x + box.width <= size[0], `${await button.getAttribute('id')} is at ${box.x}`);
-    }
+    assert.ok(stage > size[0] * (text > 100 ? 0.25 : 0.3), `the movie is ${stage} pixels wide`);
+    assert.deepEqual(await page.evaluate(hiddenControls), []);
+    for (const id of ['frame-back', 'frame-forward', 'full-screen', 'clock-total'])
+      assert.ok(await page.locator(`#${id}`).isVisible(), id);
     await close();
   });
+
+test('the movie stays in sight where the page scrolls', async () => {
+  for (const size of [[360, 740], [720, 450]]) {
+    const { page, close } = await open(recording.page, { size });
+    await opened(page);
+    await ready(page);
+    await page.evaluate(() => scrollTo(0, document.documentElement.scrollHeight));
+    await page.waitForFunction(() => scrollY > 100);
+    const { y, height } = await page.locator('#frame').boundingBox();
+    assert.ok(y >= 0 && height > 100 && y + height < size[1] * 0.7, `${y} to ${y + height}`);
+    await close();
+  }
+});
+
+test('full screen has a scrubber', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  await ready(page);
+  assert.equal(await page.locator('#scrubber').isVisible(), false);
+  await page.locator('#full-screen').click();
+  await page.waitForFunction(() => document.fullscreenElement);
+  const box = await page.locator('#scrubber').boundingBox();
+  assert.ok(box.y > 0 && box.y + box.height <= page.viewportSize().height);
+  await page.mouse.click(box.x + box.width / 2, box.y + box.height / 2);
+  const { time } = await page.evaluate(() => zulmViewer.state());
+  assert.ok(Math.abs(time - 10) < 0.2, `${time}`);
+  await page.keyboard.press('Space');
+  await page.waitForFunction(() => zulmViewer.state().playing);
+  await close();
+});
+
+test('while a recording loads nobody is asked for one', async () => {
+  const before = () => {
+    globalThis.Worker = class {
+      postMessage() {} // takes forever
+      terminate() {}
+    };
+  };
+  const { page, close } = await open(recording.page, { before, size: [360, 740] });
+  assert.equal(await page.locator('#welcome-title').innerText(), 'Opening Recording.mp4…');
+  assert.ok(await page.locator('.welcome progress').isVisible());
+  assert.equal(await page.locator('#welcome-open').isVisible(), false);
+  await close();
+});
+
+test('heads of columns are whole', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  for (const kind of ['cursorImage', 'keyboardAction', 'systemData']) {
+    await page.getByLabel('Stream', { exact: true }).selectOption(kind);
+    const cut = await page.evaluate(() =>
+      [...document.querySelectorAll('.table-head > *')]
+        .filter(({ scrollWidth, clientWidth }) => scrollWidth > clientWidth)
+        .map(({ textContent }) => textContent),
+    );
+    assert.deepEqual(cut, [], kind);
+  }
+  await close();
+});
 
 test('whoever wants less motion gets no trail', async () => {
   const drawn = async (reducedMotion) => {
@@ -88,4 +171,132 @@ test('whoever wants less motion gets no trail', async () => {
   };
   assert.equal(await drawn('no-preference'), true);
   assert.equal(await drawn('reduce'), false);
+});
+
+/// The largest contrast of anything drawn in a part of the lanes with the page below it.
+function contrastIn({ left, top, width, height }) {
+  const canvas = document.querySelector('.lanes-canvas');
+  const ratio = canvas.width / canvas.clientWidth;
+  const [x, y, w, h] = [left, top, width, height].map((value) => Math.round(value * ratio));
+  const { data } = canvas.getContext('2d').getImageData(x, y, w, h);
+  const light = (r, g, b) =>
+    [r, g, b]
+      .map((value) => (value / 255 <= 0.03928 ? value / 255 / 12.92 : ((value / 255 + 0.055) / 1.055) ** 2.4))
+      .reduce((sum, value, i) => sum + value * [0.2126, 0.7152, 0.0722][i], 0);
+  const page = light(...getComputedStyle(document.querySelector('.timeline')).backgroundColor.match(/[\d.]+/g).map(Number));
+  let most = 1;
+  for (let i = 0; i < data.length; i += 4) {
+    if (data[i + 3] < 250) continue;
+    const drawn = light(data[i], data[i + 1], data[i + 2]);
+    most = Math.max(most, (Math.max(drawn, page) + 0.05) / (Math.min(drawn, page) + 0.05));
+  }
+  return most;
+}
+
+test('bands, rests and other clicks can be told without fine colours', async () => {
+  const rested = attached('Rested', 'plain.mp4', { cursorLocation: positionsOf([[0, 200, 200], [10, 300, 300]]) });
+  for (const theme of ['light', 'dark']) {
+    const { page, close } = await open(recording.page, { theme });
+    await opened(page);
+    await page.waitForTimeout(300);
+    const placeOf = async (title) => {
+      const label = await page.locator('.lane-label', { hasText: title }).boundingBox();
+      const body = await page.locator('.lanes-body').boundingBox();
+      return { top: label.y - body.y, height: label.height - 1, width: body.width };
+    };
+    for (const title of ['Application', 'Hover']) {
+      const { top, height, width } = await placeOf(title);
+      const edge = { left: width * 0.3, top: top + 2, width: width * 0.3, height: 3 }; // above the names
+      const contrast = await page.evaluate(contrastIn, edge);
+      assert.ok(contrast >= 3, `${theme}: ${title} ${contrast.toFixed(2)}`);
+      assert.ok(height > 10);
+    }
+    // At half its height a disc is as wide as a square, near its top it is not.
+    const { top, width } = await placeOf('Clicks');
+    const rows = await page.evaluate(
+      ({ top, places }) => {
+        const canvas = document.querySelector('.lanes-canvas');
+        const ratio = canvas.width / canvas.clientWidth;
+        const context = canvas.getContext('2d');
+        const filled = (x, y) => {
+          const { data } = context.getImageData(Math.round((x - 8) * ratio), Math.round(y * ratio), Math.round(16 * ratio), 1);
+          return data.filter((value, i) => i % 4 === 3 && value > 200).length / ratio;
+        };
+        return places.map((x) => filled(x, top + 10 - 3));
+      },
+      { top, places: [1.5, 8].map((time) => (time / 20) * width) },
+    );
+    assert.ok(rows[0] <= 5 && rows[1] >= 6, `a left click is ${rows[0]} wide near its top, a right one ${rows[1]}`);
+    await close();
+
+    const rest = await open(rested.page, { theme });
+    await opened(rest.page);
+    await rest.page.waitForTimeout(300);
+    const body = await rest.page.locator('.lanes-body').boundingBox();
+    const contrast = await rest.page.evaluate(contrastIn, { left: body.width * 0.2, top: 0, width: 40, height: 3 });
+    assert.ok(contrast >= 3, `${theme}: a rest ${contrast.toFixed(2)}`);
+    await rest.close();
+  }
+});
+
+test('forced colours keep what is selected and what has the keys', async () => {
+  const { page, close } = await open(recording.page, { forcedColors: 'active' });
+  await opened(page);
+  await page.locator('.table-row:visible').nth(3).click();
+  const colours = (selector) =>
+    page.evaluate((selector) => {
+      const { backgroundColor, outlineStyle, outlineWidth, color } = getComputedStyle(document.querySelector(selector));
+      return { backgroundColor, outlineStyle, outlineWidth, color };
+    }, selector);
+  const plain = await colours('.table-row:not(.is-selected)');
+  const selected = await colours('.table-row.is-selected');
+  assert.notEqual(selected.backgroundColor, plain.backgroundColor);
+  await page.keyboard.press('Shift+Tab');
+  const focused = await colours(':focus');
+  assert.ok(focused.outlineStyle === 'solid' && parseFloat(focused.outlineWidth) >= 2, JSON.stringify(focused));
+  await close();
+});
+
+test('splitters tell their place, Escape closes the menu, keys move the lanes', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  const value = async (name) => Number(await page.locator('#side-splitter').getAttribute(`aria-value${name}`));
+  const width = async () => (await page.locator('.side').boundingBox()).width;
+  assert.ok(Math.abs((await value('now')) - (await width())) <= 1);
+  assert.equal(await value('max'), 768);
+  await page.locator('#side-splitter').focus();
+  await page.keyboard.press('ArrowLeft');
+  assert.ok(Math.abs((await value('now')) - (await width())) <= 1);
+  await page.locator('#layers-button').click();
+  await page.locator('#play').focus();
+  await page.keyboard.press('Escape');
+  assert.equal(await page.locator('#layers-menu').isVisible(), false);
+  for (let i = 0; i < 3; ++i) await page.keyboard.press('+');
+  await page.keyboard.press('>');
+  await page.keyboard.press('>');
+  const shown = () => page.locator('.overview-window').evaluate((element) => parseFloat(element.style.left));
+  await page.waitForFunction(() => parseFloat(document.querySelector('.overview-window').style.left) > 5);
+  const before = await shown();
+  await page.keyboard.press('<');
+  await page.waitForFunction((before) => parseFloat(document.querySelector('.overview-window').style.left) < before, before);
+  await close();
+});
+
+test('units and words are those of the reader', async () => {
+  const { page, close } = await open(recording.page);
+  await opened(page);
+  await page.keyboard.press('k');
+  await seek(page, 3.6);
+  const labels = (await page.locator('.lane-labels').innerText()).replaceAll('\n', ' ');
+  assert.match(labels, /CPU usage [\d.]+ %/);
+  assert.match(labels, /Scroll [↑↓] \d+ px/);
+  assert.equal(await page.locator('#caption kbd').innerText(), 'Return');
+  assert.deepEqual(await page.locator('.legend').allInnerTexts(), ['x', 'y']);
+  assert.equal(await page.locator('#heat-legend').isVisible(), false);
+  await page.keyboard.press('7');
+  assert.ok(await page.locator('#heat-legend').isVisible());
+  await page.getByRole('tab', { name: 'Facts' }).click();
+  assert.match(await page.locator('#pane-facts').innerText(), /Memory\s+[\d.]+ GB/);
+  assert.doesNotMatch(await page.locator('body').innerText(), /keystroke/i);
+  await close();
 });

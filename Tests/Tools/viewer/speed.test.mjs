@@ -71,7 +71,9 @@ test('scrubbing, zooming and panning an hour take little script', async () => {
 
   const lanes = await page.locator('.lanes-body').boundingBox();
   await page.mouse.move(lanes.x + lanes.width / 2, lanes.y + 60);
+  await page.keyboard.down('Control');
   for (let i = 0; i < 60; ++i) await page.mouse.wheel(0, i < 40 ? -100 : 60);
+  await page.keyboard.up('Control');
   await page.waitForTimeout(200);
   check('zooming', await scripts(page));
 
@@ -91,6 +93,14 @@ test('a table of a million entries scrolls and finds', async () => {
   assert.ok(count > 1_000_000, `${count} entries`);
   const table = await page.locator('.table').boundingBox();
   await page.mouse.move(table.x + 50, table.y + 100);
+  const firstRow = () => page.evaluate(() => Number(document.querySelector('.table-row').dataset.row));
+  const notches = async (count) => {
+    for (let i = 0; i < count; ++i) await page.mouse.wheel(0, 72);
+    await page.waitForTimeout(300);
+    return firstRow();
+  };
+  const moved = -(await notches(10)) + (await notches(40));
+  assert.ok(Math.abs(moved - 40 * 3) <= 1, `a notch moves as far as in a short table: ${moved} rows`);
   for (let i = 0; i < 60; ++i) await page.mouse.wheel(0, 40 * 1.25 ** (i % 50));
   await page.waitForTimeout(200);
   check('scrolling a million entries', await scripts(page, 'zulm:table'));

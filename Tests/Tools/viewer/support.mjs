@@ -92,15 +92,17 @@ export function emptyPage(text) {
 let browser;
 after(() => browser?.close());
 
-/// A page that keeps what went wrong in it and what it asked for.
-export async function open(path, { size = [1280, 800], theme = 'dark', hash = '', ...more } = {}) {
+/// A page that keeps what went wrong in it and what it asked for. `before` runs in it before its own script.
+export async function open(path, { size = [1280, 800], theme = 'dark', hash = '', before, ...more } = {}) {
   browser ??= await chromium.launch({
     executablePath: process.env.CHROMIUM ?? '/usr/bin/chromium',
-    args: ['--no-sandbox', '--disable-gpu', '--force-color-profile=srgb', '--hide-scrollbars'],
+    args: ['--no-sandbox', '--disable-gpu', '--force-color-profile=srgb'],
+    ignoreDefaultArgs: ['--hide-scrollbars'], // readers see them
   });
   const [width, height] = size;
   const context = await browser.newContext({ viewport: { width, height }, colorScheme: theme, ...more });
   const page = await context.newPage();
+  if (before) await page.addInitScript(before);
   const problems = [];
   const requests = [];
   page.on('pageerror', (error) => problems.push(String(error)));

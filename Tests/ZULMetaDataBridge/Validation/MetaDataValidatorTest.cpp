@@ -507,6 +507,47 @@ TEST(MetaDataValidator, AsksForNoMoreMemoryThanTwiceTheFileAnd16MiB) {
     }
 }
 
+std::string le16(std::uint16_t value) {
+    return raw(value);
+}
+
+/// A field of a TIFF directory with 32-bit numbers: the number itself, or where they are.
+std::string tiffField(std::uint16_t tag, std::uint32_t count, std::uint32_t value) {
+    return le16(tag) + le16(4) + le32(count) + le32(value);
+}
+
+/// A grey picture of 2048 x 3600 pixels in 113 KiB: 36 strips of 100 rows, in each of which 128 zeros are packed into
+/// two bytes 16 times. Its pixels take 28 MiB.
+std::string packedTIFF() {
+    constexpr std::uint32_t strips = 36;
+    constexpr std::uint32_t stripSize = 100 * 16 * 2;
+    std::string file = "II*" + std::string(1, '\0') + le32(8 + strips * stripSize + strips * 8);
+    for (std::uint32_t i = 0; i < strips * stripSize / 2; ++i)
+        file += std::string("\x81\0", 2);
+    const auto offsets = static_cast<std::uint32_t>(file.size());
+    for (std::uint32_t i = 0; i < strips; ++i)
+        file += le32(8 + i * stripSize);
+    const auto sizes = static_cast<std::uint32_t>(file.size());
+    for (std::uint32_t i = 0; i < strips; ++i)
+        file += le32(stripSize);
+    return file + le16(9) + tiffField(256, 1, 2048) + tiffField(257, 1, 3600) + tiffField(258, 1, 8) +
+           tiffField(259, 1, 32773) + tiffField(262, 1, 1) + tiffField(273, strips, offsets) + tiffField(277, 1, 1) +
+           tiffField(278, 1, 100) + tiffField(279, strips, sizes) + le32(0);
+}
+
+TEST(MetaDataValidator, LetsGoOfALargeImageBeforeItDecodesASmallTIFF) {
+    const std::string tiff = packedTIFF();
+    ASSERT_EQ(Image::checkEncodedBytes({reinterpret_cast<const std::uint8_t*>(tiff.data()), tiff.size()}).state,
+              EncodedImageCheck::Decodable);
+    const std::string bytes =
+        streamHeader(s_images, 2, 0) + cursorEntry(1, std::string(21 << 19, 'x')) + cursorEntry(2, tiff);
+    std::istringstream stream(bytes);
+    const MemoryWatch memory;
+    EXPECT_EQ(validateRecording(ByteSource::stream(stream), s_raw).wholeEntries, 2U);
+    EXPECT_GE(memory.peak(), std::size_t{28} << 20) << "it was decoded";
+    EXPECT_LE(memory.peak(), 2 * bytes.size() + (std::size_t{16} << 20));
+}
+
 // ---- sizes that readers believe ----
 
 /// 37 bytes, of which a text says that it goes on for a gigabyte.

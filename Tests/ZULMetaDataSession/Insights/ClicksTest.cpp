@@ -131,7 +131,7 @@ TEST(Clicks, OfAnotherButtonAreNotCountedTogether) {
 }
 
 TEST(Clicks, AreDragsIfTheCursorMovesFarBeforeTheRelease) {
-    const auto isDrag = [](const Entries<CursorLocationKind>& entries, const ClickOptions& options = {}) {
+    const auto isDrag = [](const TrackEntries<CursorLocationKind>& entries, const ClickOptions& options = {}) {
         return clicksOf(clicksAt({1}), positions(entries), s_end, options).at(0).isDrag;
     };
     EXPECT_TRUE(isDrag({{0, {0, 0}}, {1.05, {9, 0}}, {1.1, {0, 0}}})) << "also if it comes back";

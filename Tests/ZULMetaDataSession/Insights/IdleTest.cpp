@@ -23,7 +23,7 @@ using testing::IsEmpty;
 constexpr std::int32_t s_leftDown = 1;
 constexpr std::int32_t s_leftUp = 2;
 
-std::vector<IdleSpan> idleWithPositions(const Entries<CursorLocationKind>& entries, double duration,
+std::vector<IdleSpan> idleWithPositions(const TrackEntries<CursorLocationKind>& entries, double duration,
                                         const IdleOptions& options = {}) {
     return idleSpansOf(positions(entries), {}, {}, {}, duration, options);
 }
@@ -59,7 +59,7 @@ TEST(Idle, IsNotEndedByAnActionWithoutAButton) {
 }
 
 TEST(Idle, LastsAtLeastAsLongAsAskedFor) {
-    const Entries<CursorLocationKind> entries{{0, {0, 0}}, {4, {1, 0}}, {9, {2, 0}}};
+    const TrackEntries<CursorLocationKind> entries{{0, {0, 0}}, {4, {1, 0}}, {9, {2, 0}}};
     EXPECT_THAT(idleWithPositions(entries, 10), ElementsAre(IdleSpan{4, 9}));
     EXPECT_THAT(idleWithPositions(entries, 10, {3}), ElementsAre(IdleSpan{0, 4}, IdleSpan{4, 9}));
     EXPECT_THAT(idleWithPositions(entries, 10, {6}), IsEmpty());

@@ -11,10 +11,10 @@
 namespace ZULMetaData::Test {
 
 template <class Kind>
-using Entries = std::vector<std::pair<double, typename Track<Kind>::Value>>;
+using TrackEntries = std::vector<std::pair<double, typename Track<Kind>::Value>>;
 
 template <class Kind>
-Track<Kind> trackOf(const Entries<Kind>& entries) {
+Track<Kind> trackOf(const TrackEntries<Kind>& entries) {
     std::vector<double> times;
     std::vector<typename Track<Kind>::Value> values;
     for (const auto& [time, value] : entries) {
@@ -24,7 +24,7 @@ Track<Kind> trackOf(const Entries<Kind>& entries) {
     return Track<Kind>(std::move(times), std::move(values));
 }
 
-inline Track<CursorLocationKind> positions(const Entries<CursorLocationKind>& entries) {
+inline Track<CursorLocationKind> positions(const TrackEntries<CursorLocationKind>& entries) {
     return trackOf<CursorLocationKind>(entries);
 }
 

@@ -14,7 +14,7 @@ function policy(script: string, style: string): string {
   const hash = (text: string) => `'sha256-${createHash('sha256').update(text).digest('base64')}'`;
   return [
     "default-src 'none'",
-    `script-src ${hash(script)} 'wasm-unsafe-eval' blob:`,
+    `script-src ${hash(script)} 'wasm-unsafe-eval'`,
     `style-src ${hash(style)}`,
     'worker-src blob:',
     "connect-src 'none'",

@@ -84,7 +84,7 @@ std::vector<std::string> textsOfTag(const ContainerItem& item, const std::string
     return textRuns(payload);
 }
 
-/// Returns where the children of an item begin that holds tags; its end if it holds a text itself.
+/// Returns the position of the first child of an item that holds tags; its end if it holds a text itself.
 std::uint64_t childrenOf(const ContainerItem& item, std::string_view payload) {
     if (item.type == "udta" || item.type == "ilst" || payload.substr(4).starts_with("data"))
         return item.payloadOffset();

@@ -1,7 +1,7 @@
 #pragma once
 
 // Walks every byte of the metadata of a file without trusting it, so that the file can be judged before anything else
-// opens it: no size is believed before it is checked against what is there, and no more memory is used than twice
+// opens it: no size is trusted before it is checked against what is there, and no more memory is used than twice
 // the file's size plus 16 MiB.
 //
 //     for (const Finding& finding : validateRecording("Recording.mp4").allFindings())
@@ -146,7 +146,7 @@ constexpr const FindingRule& ruleOf(FindingCode code) {
 /// Something worth telling about a file, and where it stands.
 struct Finding {
     FindingCode code;     ///< what was found
-    std::string place;    ///< the stream's kind (its identifier where that has no name), or the type of the atom, in
+    std::string place;    ///< the stream's kind (its identifier if that has no name), or the type of the atom, in
                           ///< which bytes that cannot be printed are `\xNN`
     std::uint64_t offset; ///< in the file: of the atom, the entry, the header's field, the image or the bad character
     std::string sentence; ///< for people, with the numbers in question
@@ -154,12 +154,12 @@ struct Finding {
     Severity severity() const { return ruleOf(code).severity; } ///< by the rule of its code
 };
 
-/// One stream, walked from its header to its end or to the first entry behind which no other can be found.
+/// One stream, walked from its header to its end or to the first entry after which no other can be found.
 struct ZULMETADATA_API StreamReport {
-    uuid type{};                      ///< as its header says; all zero where that is cut short
-    std::string kind;                 ///< its name in the registry; empty where it is not registered
-    std::int32_t version = -1;        ///< of its entries, as its header says; -1 where that is cut short
-    std::uint32_t fixedEntrySize = 0; ///< as its header says, right or wrong; 0 where each entry carries its size
+    uuid type{};                      ///< as its header says; all zero if that is cut short
+    std::string kind;                 ///< its name in the registry; empty if it is not registered
+    std::int32_t version = -1;        ///< of its entries, as its header says; -1 if that is cut short
+    std::uint32_t fixedEntrySize = 0; ///< as its header says, right or wrong; 0 if each entry carries its size
     std::uint64_t offset = 0;         ///< of the header in the file
     std::uint64_t declaredBytes = 0;  ///< header included, as the container says
     std::uint64_t presentBytes = 0;   ///< of them, what lies inside the container
@@ -170,7 +170,7 @@ struct ZULMETADATA_API StreamReport {
     bool isReachable = true;          ///< whether readers find it
     std::vector<Finding> findings;    ///< inside this stream
 
-    /// Its kind, or its identifier where that has no name.
+    /// Its kind, or its identifier if that has no name.
     std::string name() const;
 
     /// As it is stored, unless it is cut short.
@@ -186,7 +186,7 @@ struct ZULMETADATA_API ValidationReport {
     Container::Type container = Container::Unknown; ///< as recognized, or as the caller said
     std::uint64_t bytes = 0;                        ///< in the file
     std::optional<double> duration;                 ///< of the movie in seconds, as `movieDuration` returns it
-    std::uint64_t streamCount = 0;                  ///< `streams.size()`, or more where not all are listed
+    std::uint64_t streamCount = 0;                  ///< `streams.size()`, or more if not all are listed
     std::uint64_t wholeEntries = 0;                 ///< of all streams
     std::uint64_t damageCount = 0;                  ///< findings, listed or not
     std::uint64_t noticeCount = 0;                  ///< findings, listed or not

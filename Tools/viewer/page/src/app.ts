@@ -5,7 +5,8 @@ import { embeddedRecording, type EmbeddedRecording } from './decoder/embedded';
 import { EntriesPane } from './entries/pane';
 import { showCheck, showFacts } from './facts/pane';
 import { Timeline } from './lanes/timeline';
-import { clock } from './model/format';
+import { assumption } from './model/checks';
+import { clock, shown } from './model/format';
 import { markerAfter, markerBefore } from './model/markers';
 import { Session, type Decoded } from './model/session';
 import { timeInLink, linkTo } from './model/link';
@@ -33,6 +34,9 @@ export class App implements Page {
   private movieUrl = '';
   private movieName = '';
   private isFramePending = false;
+  private onlyTimeMoves = false;
+  private shownMovie = '';
+  private drawnTime = -1;
   private opened = 0;
   finished = 0;
   private controls!: Controls;
@@ -43,6 +47,7 @@ export class App implements Page {
     const showsKeys = () => this.stage.showsKeys;
     this.timeline = new Timeline({
       showsKeys,
+      region: () => this.stage.placement.region,
       onSeek: (time) => this.seek(time),
       onRange: ({ from, to }) => {
         this.stage.setHeatRange(from, to);
@@ -75,6 +80,7 @@ export class App implements Page {
     byId('notice-close').addEventListener('click', () => void (byId('notice').hidden = true));
     window.addEventListener('hashchange', () => this.followLink());
     this.player.onChange = () => this.playerChanged();
+    this.player.onPicture = () => this.pictureChanged();
     this.stage.images.onDecoded = () => this.requestFrame();
     this.openEmbedded();
   }
@@ -103,6 +109,7 @@ export class App implements Page {
     const url = URL.createObjectURL(file);
     await this.open(file, file.name, (decoded) => {
       this.setMovie(url, file.name);
+      history.replaceState(null, '', linkTo(0)); // the address told a time of the recording before
       return decoded;
     });
     if (this.movieUrl !== url) URL.revokeObjectURL(url);
@@ -112,6 +119,7 @@ export class App implements Page {
   private async open(source: Blob | string, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
     const opening = ++this.opened;
     document.body.classList.add('is-busy');
+    setText(byId('welcome-title'), `Opening ${shown(name)}…`);
     try {
       if (source instanceof Blob && source.size === 0) throw new Error('it is empty');
       const { id, decoded, problems } = await this.decoder.open(source, name);
@@ -127,9 +135,14 @@ export class App implements Page {
       this.complain(`${name} cannot be shown: ${wordsOf(error, name)}.`);
       this.decoder.keep();
     } finally {
-      if (opening === this.opened) document.body.classList.remove('is-busy');
+      if (opening === this.opened) this.isOpened();
       ++this.finished;
     }
+  }
+
+  private isOpened(): void {
+    document.body.classList.remove('is-busy');
+    setText(byId('welcome-title'), 'Drop a recording here');
   }
 
   private setMovie(url: string | null, name: string): void {
@@ -141,10 +154,10 @@ export class App implements Page {
   private show(session: Session): void {
     this.session = session;
     document.body.classList.remove('is-empty');
-    document.title = `${session.name} – ZULMetaData`;
-    setText(byId('recording-name'), session.name);
+    document.title = `${shown(session.name)} – ZULMetaData`;
+    setText(byId('recording-name'), shown(session.name));
     const canHavePictures = session.container !== 'stream';
-    this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration);
+    this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration, session.movieDuration === undefined);
     this.stage.show(session);
     this.timeline.show(session, this.player.duration);
     this.followLink();
@@ -158,10 +171,10 @@ export class App implements Page {
     if (session !== this.session) return;
     this.entries.show(session);
     showFacts(session, this.player.duration);
-    showCheck(session);
+    showCheck(session, this.player.size);
     this.requestFrame();
     void this.stage.images.prepare(session.appearances);
-    announce(`${session.name} is open`);
+    announce(`${shown(session.name)} is open`);
   }
 
   // Time
@@ -176,8 +189,8 @@ export class App implements Page {
   }
 
   stepFrame(direction: 1 | -1): void {
-    this.player.pause();
-    this.step(direction * this.player.frameLength);
+    this.player.stepFrame(direction);
+    this.timeline.reveal(this.player.time);
   }
 
   stepMarker(direction: 1 | -1): void {
@@ -197,6 +210,10 @@ export class App implements Page {
   zoom(factor: number): void {
     if (factor === 0) this.timeline.showAll();
     else this.timeline.zoom(factor);
+  }
+
+  pan(part: number): void {
+    this.timeline.pan(part);
   }
 
   private followLink(): void {
@@ -237,12 +254,24 @@ export class App implements Page {
   }
 
   private playerChanged(): void {
-    if (this.session) this.timeline.setDuration(this.player.duration);
+    const { session, player } = this;
+    if (session) this.timeline.setDuration(player.duration);
     this.stage.lay();
+    if (session && player.movie !== this.shownMovie) {
+      this.shownMovie = player.movie;
+      this.timeline.invalidate(); // the movie may show another part of the screen
+      showCheck(session, player.size);
+    }
     this.controls.showState();
     this.tellOfMovie();
     this.writeLink();
     this.requestFrame();
+  }
+
+  /// Picture and overlay are drawn together, before the browser shows either.
+  private pictureChanged(): void {
+    this.stage.drawPicture();
+    this.frame();
   }
 
   private tellOfMovie(): void {
@@ -256,22 +285,27 @@ export class App implements Page {
         : this.movieUrl.startsWith('blob:')
           ? `This browser can show no pictures of ${name}.`
           : `${name} is not beside this page, or has no pictures that this browser can show.`;
-    setText(note, `${reason} The recorded region stands for it.`);
+    const stand = this.session?.region ? 'The recorded region stands for it.' : assumption(undefined);
+    setText(note, shown(`${reason} ${stand}`));
   }
 
   complain(text: string): void {
-    setText(byId('notice-text'), text);
+    setText(byId('notice-text'), shown(text));
     byId('notice').hidden = false;
   }
 
   requestFrame(): void {
+    this.onlyTimeMoves = false;
     if (this.isFramePending) return;
     this.isFramePending = true;
     requestAnimationFrame((now) => {
       this.isFramePending = false;
       this.player.tick(now);
-      this.frame();
-      if (this.player.playing) this.requestFrame();
+      if (this.drawnTime !== this.player.time || !this.onlyTimeMoves) this.frame();
+      this.onlyTimeMoves = false;
+      if (!this.player.playing) return;
+      this.requestFrame();
+      this.onlyTimeMoves = true;
     });
   }
 
@@ -279,6 +313,7 @@ export class App implements Page {
     if (!this.session) return;
     measured('zulm:frame', () => {
       const { time, playing } = this.player;
+      this.drawnTime = time;
       if (playing) this.timeline.reveal(time);
       this.stage.draw(time);
       this.timeline.draw(time);

@@ -1,9 +1,9 @@
 // Stands in for the decoder where it has not been built: every file is the synthetic recording.
 
-import type { Column, Entries, StreamSummary } from '../../../../Bindings/JavaScript/zulmetadata';
+import type { Column, Entries, StreamSummary, Table } from '../../../../Bindings/JavaScript/zulmetadata';
 import { syntheticEntries } from './synthetic';
 
-export type { Column, Entries, StreamSummary };
+export type { Column, Entries, StreamSummary, Table };
 
 export class ZulmError extends Error {}
 
@@ -41,13 +41,29 @@ export class Recording {
     return this.all.find((entries) => entries.kind === kind)!;
   }
 
-  /// Every key is a caption here.
-  keyCaptions(showsKeys: boolean): Entries {
-    const { kind, time, columns } = this.entries('keyboardAction');
-    const label = (columns.characterString as string[]).map((name) => (showsKeys ? name : '•'));
+  /// Every key is a caption here, and nobody is ever idle or clicks.
+  insights(name: string, { shows_keys: showsKeys }: { shows_keys?: boolean } = {}): Table {
+    if (name !== 'captions') return { kind: name, time: new Float64Array(), columns: {} };
+    const { time, columns } = this.entries('keyboardAction');
+    const label = (columns.characterString as string[]).map((key) => (showsKeys ? key : '•'));
     const first = Int32Array.from(label, (_, i) => i);
     const end = time.map((pressed) => pressed + 1.5);
-    return { kind, time, columns: { label, isTyped: first.map(() => 1), first, end } };
+    return { kind: name, time, columns: { label, is_typed: first.map(() => 1), first, end } };
+  }
+
+  /// Every entry shows its own picture here.
+  at(times: Float64Array): Table {
+    const { columns } = this.entries('cursorImage');
+    return {
+      kind: 'states',
+      time: times,
+      columns: {
+        cursor_id: Array.from(columns.id as BigUint64Array, String),
+        picture: columns.image!,
+        hotspot_x: columns.hotspotOffsetX!,
+        hotspot_y: columns.hotspotOffsetY!,
+      },
+    };
   }
 
   info(): object {

@@ -1,5 +1,6 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
+import { memoryText } from '../src/model/format';
 import { captionAt, captionText, keyCap } from '../src/model/keys';
 import { Track } from '../src/model/track';
 
@@ -12,7 +13,7 @@ function track(...keys: Key[]): Track {
     time: Float64Array.from(keys, ([time]) => time),
     columns: {
       label: keys.map(([, label]) => label),
-      isTyped: Int32Array.from(keys, ([, , isTyped]) => Number(isTyped)),
+      is_typed: Int32Array.from(keys, ([, , isTyped]) => Number(isTyped)),
       first: Int32Array.from(keys, ([, , , first]) => first),
       end: Float64Array.from(keys, ([, , , , end]) => end),
     },
@@ -53,9 +54,25 @@ test('typed keys are one text, other keys stand alone', () => {
 });
 
 test('a key with a name shows without brackets on a cap', () => {
-  assert.deepEqual(['[returnKey]', '⌃[up]', '⌘S', '['].map(keyCap), ['returnKey', '⌃up', '⌘S', '[']);
+  assert.deepEqual(['[returnKey]', '⌃[up]', '⌘S', '['].map(keyCap), ['Return', '⌃↑', '⌘S', '[']);
 });
 
 test('a recording without keys has no captions', () => {
   assert.deepEqual(captionAt(undefined, 1), []);
+});
+
+test('keys are called as on a keyboard', () => {
+  assert.equal(keyCap('[returnKey]'), 'Return');
+  assert.equal(keyCap('⇧⌘[left]'), '⇧⌘←');
+  assert.equal(keyCap('[f12]'), 'F12');
+  assert.equal(keyCap('[key 200]'), 'Key 200');
+  assert.equal(keyCap('⌘S'), '⌘S');
+  assert.equal(keyCap('[]'), '[]');
+  assert.equal(keyCap(']'), ']');
+});
+
+test('memory is told in gigabytes', () => {
+  assert.equal(memoryText('24105MB'), '24 GB');
+  assert.equal(memoryText('512 MB'), '0.5 GB');
+  assert.equal(memoryText('plenty'), 'plenty');
 });

@@ -2,7 +2,7 @@ import assert from 'node:assert/strict';
 import { test } from 'node:test';
 import { clampedRange, tickDigits, ticks, tickStep, zoomed } from '../src/lanes/axis';
 import { Extremes } from '../src/lanes/extremes';
-import { speeds } from '../src/model/speed';
+import { speedOf } from '../src/model/speed';
 import { Track } from '../src/model/track';
 import { randomNumbers, syntheticEntries } from './synthetic';
 
@@ -40,13 +40,35 @@ test('zooming keeps the time below the pointer where it is', () => {
   assert.deepEqual(zoomed({ from: 5, to: 15 }, 10, 100, 20), { from: 0, to: 20 });
 });
 
-test('speed is the way from the position before', () => {
-  const track = new Track({
-    kind: 'cursorLocation',
-    time: Float64Array.of(0, 0.5, 0.5, 1),
-    columns: { x: Int32Array.of(0, 30, 60, 60), y: Int32Array.of(0, 40, 80, 80) },
-  });
-  assert.deepEqual([...speeds(track)], [0, 100, 0, 0]);
+function speedAlong(time: number[], x: number[]) {
+  const { times, values } = speedOf(
+    new Track({
+      kind: 'cursorLocation',
+      time: Float64Array.from(time),
+      columns: { x: Int32Array.from(x), y: new Int32Array(x.length) },
+    }),
+  );
+  return [...times].map((time, i) => [Number(time.toFixed(6)), Math.round(values[i]!)]);
+}
+
+test('speed is the way to the next position, and the last one is a rest', () => {
+  assert.deepEqual(speedAlong([0, 0.5, 0.5, 1], [0, 50, 80, 80]), [
+    [0, 100],
+    [0.5, 0],
+    [1, 0],
+  ]);
+});
+
+test('the cursor rests where nothing was recorded, and moves within the last usual distance', () => {
+  assert.deepEqual(speedAlong([0, 0.1, 0.2, 0.3, 5, 5.1], [0, 10, 20, 30, 40, 50]), [
+    [0, 100],
+    [0.1, 100],
+    [0.2, 100],
+    [0.3, 0],
+    [4.9, 100],
+    [5, 100],
+    [5.1, 0],
+  ]);
 });
 
 test('the synthetic hour has what a real one has', () => {

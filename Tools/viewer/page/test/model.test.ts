@@ -1,22 +1,23 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
-import type { Column, Entries } from '#decoder';
-import { cursorAppearances } from '../src/model/appearances';
-import { clickLabel, clicksAround, clicksOf } from '../src/model/clicks';
+import type { Column, Entries, Table } from '#decoder';
+import { appearancesIn } from '../src/model/appearances';
+import { clickLabel, clicksAround, clicksIn } from '../src/model/clicks';
 import { bytes, clock, plural, spokenTime, titleOf } from '../src/model/format';
+import { idleIn, idleTime } from '../src/model/idle';
 import { heatHeight, heatOf, heatWidth } from '../src/model/heat';
 import { placementOf } from '../src/model/geometry';
 import { linkTo, timeInLink } from '../src/model/link';
 import { markerAfter, markerBefore } from '../src/model/markers';
 import { countBefore, countUntil, lastAt } from '../src/model/search';
-import { Session, type Decoded } from '../src/model/session';
+import { believableEnd, Session, type Decoded } from '../src/model/session';
 import { Track } from '../src/model/track';
 
 export function entries(kind: string, time: number[], columns: Record<string, Column> = {}): Entries {
   return { kind, time: Float64Array.from(time), columns };
 }
 
-function session(...list: Entries[]): Session {
+function session(list: Entries[], tables: Partial<Decoded> = {}): Session {
   const decoded: Decoded = {
     name: 'Test.mp4',
     container: 'movie',
@@ -24,9 +25,13 @@ function session(...list: Entries[]): Session {
     streams: [],
     entries: list,
     keys: undefined,
+    clicks: undefined,
+    idle: undefined,
+    appearances: undefined,
     hidden: [],
     info: {},
     verify: {},
+    ...tables,
   };
   return new Session(decoded);
 }
@@ -53,31 +58,41 @@ test('a track brings its entries into the order of their times, and leaves out t
   assert.equal(track.at(2.5), 1);
 });
 
-test('an entry without an image shows the one that came with its number before', () => {
-  const [arrow, hand] = [Uint8Array.of(1), Uint8Array.of(2)];
-  const track = new Track(
-    entries('cursorImage', [0, 1, 2, 3, 4], {
-      id: BigUint64Array.of(9n, 7n, 8n, 7n, 8n),
-      image: [null, arrow, hand, null, null],
-      hotspotOffsetX: Int32Array.of(0, 5, 6, 0, 0),
-      hotspotOffsetY: Int32Array.of(0, 3, 4, 0, 0),
-    }),
-  );
-  const shown = cursorAppearances(track);
+test('an appearance is what the library knows at the time of an entry', () => {
+  const arrow = Uint8Array.of(1);
+  const shown = appearancesIn({
+    kind: 'states',
+    time: Float64Array.of(0, 1),
+    columns: {
+      cursor_id: ['9', '7'],
+      picture: [null, arrow],
+      hotspot_x: Float64Array.of(NaN, 5),
+      hotspot_y: Float64Array.of(NaN, 3),
+    },
+  });
   assert.deepEqual(
-    shown.map(({ image }) => image.length && image[0]),
-    [0, 1, 2, 1, 2],
+    shown.map(({ id, image }) => [id, image.length]),
+    [
+      ['9', 0],
+      ['7', 1],
+    ],
   );
-  assert.deepEqual(shown[3]!.hotSpot, { x: 5, y: 3 });
+  assert.deepEqual(shown[1]!.hotSpot, { x: 5, y: 3 });
+  assert.deepEqual(appearancesIn(undefined), []);
 });
 
-test('a button is held until it comes up', () => {
-  const track = new Track(
-    entries('cursorAction', [0, 1, 2, 2.5, 3, 4], {
-      action: ['mouse init', 'left down + shift + cmd', 'right down', 'left up', 'right up', 'middle down'],
-    }),
-  );
-  const clicks = clicksOf(track, 20);
+const clickTable: Table = {
+  kind: 'clicks',
+  time: Float64Array.of(1, 2, 4),
+  columns: {
+    end: Float64Array.of(2.5, 3, 5),
+    button: ['left', 'right', 'middle'],
+    modifiers: ['shift+cmd', '', ''],
+  },
+};
+
+test('a click has its button and its modifiers', () => {
+  const clicks = clicksIn(clickTable);
   assert.deepEqual(
     clicks.map(({ button, start, end }) => [button, start, end]),
     [
@@ -97,38 +112,35 @@ test('a button is held until it comes up', () => {
 
 test('markers are clicks, windows and slides', () => {
   const { markers } = session(
-    entries('cursorAction', [5], { action: ['left down'] }),
-    entries('topmostAppName', [0, 7], { name: ['Editor', 'Terminal'] }),
-    entries('topmostWindowTitle', [0, 7.01], { title: ['a', 'b'] }),
-    entries('slideTitles', [9], { title: ['One'] }),
+    [
+      entries('topmostAppName', [0, 7], { name: ['Editor', 'Terminal'] }),
+      entries('topmostWindowTitle', [0, 7.01], { title: ['a', 'b'] }),
+      entries('slideTitles', [9], { title: ['One'] }),
+    ],
+    { clicks: clickTable },
   );
-  assert.deepEqual([...markers], [0, 5, 7, 9]);
-  assert.equal(markerAfter(markers, 5), 7);
-  assert.equal(markerBefore(markers, 5), 0);
+  assert.deepEqual([...markers], [0, 1, 2, 4, 7, 9]);
+  assert.equal(markerAfter(markers, 4), 7);
+  assert.equal(markerBefore(markers, 1), 0);
   assert.equal(markerAfter(markers, 9), undefined);
 });
 
-test('the person is idle where nothing moves for three seconds', () => {
-  const still = (length: number) => new Int32Array(length).fill(4);
-  const { idle } = session(
-    entries('cursorLocation', [0, 1, 2, 3, 4, 5, 6, 7, 8], {
-      x: Int32Array.of(1, 2, 2, 2, 2, 2, 3, 3, 3),
-      y: still(9),
-    }),
-    entries('keyboardAction', [8, 18.5]),
-  );
-  assert.deepEqual(idle, [
+test('idle times are what the library tells', () => {
+  const stretches = idleIn({
+    kind: 'idle',
+    time: Float64Array.of(1, 8),
+    columns: { end: Float64Array.of(6, 18.5) },
+  });
+  assert.deepEqual(stretches, [
     { start: 1, end: 6 },
     { start: 8, end: 18.5 },
   ]);
+  assert.equal(idleTime(stretches), 15.5);
+  assert.deepEqual(idleIn(undefined), []);
 });
 
-test('a recording without any input is not idle: nothing is known', () => {
-  assert.deepEqual(session(entries('cpuUsage', [0])).idle, []);
-});
-
-test('the last region with an area is the recorded one, and the length covers every entry', () => {
-  const recording = session(
+test('the last region with an area is the recorded one, and the movie says how long it is', () => {
+  const recording = session([
     entries('recordingRegion', [0, 1], {
       x: Int32Array.of(1, 9),
       y: Int32Array.of(2, 9),
@@ -136,9 +148,20 @@ test('the last region with an area is the recorded one, and the length covers ev
       height: Int32Array.of(4, 9),
     }),
     entries('cpuUsage', [0, 25.5]),
-  );
+  ]);
   assert.deepEqual(recording.region, { x: 1, y: 2, width: 3, height: 4 });
-  assert.equal(recording.duration, 25.5);
+  assert.equal(recording.duration, 20);
+});
+
+test('without a movie the last entry ends the recording, unless its time cannot be believed', () => {
+  const end = (...times: number[]) => believableEnd([Float64Array.of(0, 1, 8), Float64Array.from(times)]);
+  assert.equal(end(), 8);
+  assert.equal(end(25.5), 25.5);
+  assert.equal(end(1e9), 8);
+  assert.equal(end(9, 1e9, 2e9), 9);
+  assert.equal(end(30000, 50000, 90000, 100000), 100000);
+  assert.equal(believableEnd([Float64Array.of(1e9)]), 1e9);
+  assert.equal(believableEnd([]), 0);
 });
 
 test('the place where the cursor stayed longest is the warmest', () => {
@@ -159,6 +182,7 @@ test('links tell a time', () => {
   assert.equal(timeInLink('#t=abc'), undefined);
   assert.equal(timeInLink(''), undefined);
   assert.equal(linkTo(12.5000001), '#t=12.5');
+  assert.equal(linkTo(1.533334), '#t=1.533334', 'the picture after the one of 1.533');
 });
 
 test('numbers and times in words', () => {

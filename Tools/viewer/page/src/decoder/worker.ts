@@ -1,7 +1,9 @@
 // Decodes a recording away from the page, so that the page goes on whatever the file holds.
 
 import { Recording, ZulmError, type Entries } from '#decoder';
+import { shortestIdle } from '../model/idle';
 import type { Decoded } from '../model/session';
+import { Track } from '../model/track';
 import type { Reply, Request } from './protocol';
 
 const recordings = new Map<number, Recording>();
@@ -34,9 +36,14 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
     const read = known ? attempt(kind, () => opened.entries(kind)) : undefined;
     if (read) entries.push(read);
   }
-  const keys = entries.some(({ kind }) => kind === 'keyboardAction')
-    ? attempt('captions', () => ({ clear: opened.keyCaptions(true), masked: opened.keyCaptions(false) }))
-    : undefined;
+  const keys = attempt('captions', () => ({
+    clear: opened.insights('captions', { shows_keys: true }),
+    masked: opened.insights('captions', { shows_keys: false }),
+  }));
+  const clicks = attempt('clicks', () => opened.insights('clicks'));
+  const idle = attempt('idle times', () => opened.insights('idle', { least: shortestIdle }));
+  const cursors = entries.find(({ kind }) => kind === 'cursorImage');
+  const appearances = cursors && attempt('cursors', () => opened.at(new Track(cursors).times));
   const hidden = opened.hidden.map((stream, index) => ({
     stream: { ...stream },
     entries: stream.known ? attempt(`hidden ${stream.kind}`, () => opened.hiddenEntries(index)) : undefined,
@@ -47,7 +54,10 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
     duration: opened.duration,
     streams: opened.streams.map((stream) => ({ ...stream })),
     entries,
-    keys,
+    keys: keys && keys.clear.time.length > 0 ? keys : undefined,
+    clicks,
+    idle,
+    appearances,
     hidden,
     info: (reports && attempt('facts', () => opened.info())) || {},
     verify: (reports && attempt('check', () => opened.verify())) || {},

@@ -22,8 +22,14 @@ export function asCSV(rows: Rows, chosen: Iterable<number>): string {
     .join('');
 }
 
+/// Clipboards end a text at its first NUL.
+export function copyable(text: string): string {
+  return text.replaceAll('\0', '␀');
+}
+
 /// Pages from a disk may have no clipboard of their own.
-export async function copyText(text: string): Promise<void> {
+export async function copyText(source: string): Promise<void> {
+  const text = copyable(source);
   try {
     await navigator.clipboard.writeText(text);
   } catch {

@@ -5,7 +5,7 @@ import { partition } from '../model/search';
 import type { HiddenStream, Session } from '../model/session';
 import { announce, byId, make, setText } from '../ui/dom';
 import { setIcon } from '../ui/icons';
-import { asCSV, asJSON, copyText } from './copy';
+import { asCSV, asJSON, copyable, copyText } from './copy';
 import { filterRows, testOf } from './filter';
 import { AllRows, StreamRows, type Rows } from './rows';
 import { Table } from './table';
@@ -24,6 +24,7 @@ export class EntriesPane {
   private session: Session | undefined;
   private rows: Rows | undefined;
   private matches: Uint32Array | null = null;
+  private isDone = true;
   private search = 0;
   private time = -1;
   private readonly table = new Table();
@@ -67,6 +68,8 @@ export class EntriesPane {
       this.step(event.shiftKey ? -1 : 1);
     });
     this.table.onActivate = (row) => this.go(row);
+    this.table.onSelect = () => this.showStatus();
+    this.table.element.addEventListener('copy', (event) => this.copyHere(event));
   }
 
   private tool(icon: string, name: string, action: () => void, text = ''): HTMLButtonElement {
@@ -162,10 +165,18 @@ export class EntriesPane {
   }
 
   private showMatches(rows: Rows, matches: Uint32Array | null, isDone: boolean): void {
-    this.matches = matches;
+    [this.rows, this.matches, this.isDone] = [rows, matches, isDone];
     this.table.choose(matches);
+    this.showStatus();
+  }
+
+  private showStatus(): void {
+    const { rows, matches, isDone } = this;
+    if (!rows) return;
     const found = matches ? `${count(matches.length)} of ${count(rows.count)}` : plural(rows.count, 'entry', 'entries');
-    setText(this.status, isDone ? found : `${found} …`);
+    const { selectedCount } = this.table;
+    const selected = selectedCount > 0 ? `, ${count(selectedCount)} selected` : '';
+    setText(this.status, `${found}${isDone ? '' : ' …'}${selected}`);
   }
 
   /// To the next match, or entry, behind or before the playhead.
@@ -180,14 +191,24 @@ export class EntriesPane {
         ? partition(length, (i) => timeOf(i) <= this.time + near)
         : partition(length, (i) => timeOf(i) < this.time - near) - 1;
     if (place < 0 || place >= length) return announce(direction > 0 ? 'No further match' : 'No match before');
-    this.go(matches ? matches[place]! : place);
+    const row = matches ? matches[place]! : place;
+    this.go(row);
+    this.table.visit(row);
   }
 
   private go(row: number): void {
     const time = this.rows?.time(row) ?? NaN;
-    if (!Number.isFinite(time)) return;
-    this.events.onSeek(time);
-    this.table.select(row);
+    if (Number.isFinite(time)) this.events.onSeek(time);
+  }
+
+  /// By the keys of the system, where the browser asks what to copy.
+  private copyHere(event: ClipboardEvent): void {
+    if (!this.rows || !event.clipboardData || this.table.selectedCount > mostCopied) return;
+    const rows = [...this.table.wantedHere()];
+    if (rows.length === 0) return;
+    event.clipboardData.setData('text/plain', copyable(asCSV(this.rows, rows)));
+    event.preventDefault();
+    setText(this.status, `${plural(rows.length, 'entry', 'entries')} copied as CSV`);
   }
 
   private async copy(name: string, write: (rows: Rows, chosen: Iterable<number>) => string): Promise<void> {

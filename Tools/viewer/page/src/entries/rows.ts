@@ -1,6 +1,6 @@
 // The rows of the entries' table: one stream in its own order, or all of them by time.
 
-import { brief, clock, titleOf } from '../model/format';
+import { brief, clock, shown, titleOf } from '../model/format';
 import { mask } from '../model/keys';
 import { lastAt } from '../model/search';
 import type { Track } from '../model/track';
@@ -69,11 +69,12 @@ export class StreamRows implements Rows {
   cell(row: number, column: number): string {
     if (column === 0) return timeText(this.time(row));
     const value = this.value(row, this.names[column - 1]!);
-    return value === null || value === undefined ? '–' : typeof value === 'number' ? brief(value) : value;
+    return value === null || value === undefined ? '–' : typeof value === 'number' ? brief(value) : shown(value);
   }
 
   value(row: number, name: string): CellValue | undefined {
     if (name === 'timestamp') return plain(this.time(row));
+    if (name === 'kind') return this.track.kind;
     const column = this.track.entries.columns[name];
     if (!column) return undefined;
     return isMasked(this.track.kind, name, this.showsKeys()) ? mask : plain(column[row]);
@@ -94,7 +95,7 @@ export class StreamRows implements Rows {
   /// All fields in one line.
   summary(row: number): string {
     const parts = this.names.map((name) => `${name}=${this.value(row, name) ?? '–'}`);
-    return parts.join('  ');
+    return shown(parts.join('  '));
   }
 }
 

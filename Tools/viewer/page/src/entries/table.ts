@@ -23,15 +23,18 @@ function leastWidth(rows: Rows, column: number): number {
   const { name, title, isNumber } = rows.columns[column]!;
   if (column === 0) return 4.75;
   if (name === 'kind') return 8;
-  if (!isNumber) return 7;
-  let longest = Math.min(title.length, 9); // which may be cut
+  const head = Math.max(3.5, title.length * letter);
+  if (!isNumber) return Math.max(7, head);
+  let longest = title.length;
   const step = Math.max(1, Math.floor(rows.count / sampled));
   for (let row = 0; row < rows.count; row += step) longest = Math.max(longest, rows.cell(row, column).length);
-  return Math.max(3.5, Math.min(longest, 22) * letter);
+  return Math.max(head, Math.min(longest, 22) * letter);
 }
 
 export class Table {
   onActivate: (row: number) => void = () => {};
+  /// Told when other rows are selected.
+  onSelect: () => void = () => {};
   private rows: Rows | undefined;
   /// The rows to show; null is all of them.
   private chosen: Uint32Array | null = null;
@@ -44,10 +47,16 @@ export class Table {
   /// Places of the chosen rows, the second one where the selection was begun.
   private selected = -1;
   private anchor = -1;
+  /// Whether the reader selected them, and did not only come by.
+  private isSelection = false;
+  /// Pixels above the first row in sight if every row had its height, and where the scroll bar was put for them.
+  private top = 0;
+  private barTop = 0;
 
   constructor() {
     this.scroller.append(make('div', { role: 'rowgroup', class: 'table-top' }, this.head), this.space);
-    this.scroller.addEventListener('scroll', () => measured('zulm:table', () => this.draw()));
+    this.scroller.addEventListener('scroll', () => measured('zulm:table', () => this.scrolled()));
+    this.scroller.addEventListener('wheel', (event) => this.wheel(event), { passive: false });
     this.scroller.addEventListener('keydown', (event) => this.press(event));
     this.space.addEventListener('click', (event) => this.click(event));
     this.space.addEventListener('pointerover', ({ target }) => showWhole(target as HTMLElement));
@@ -55,7 +64,8 @@ export class Table {
   }
 
   show(rows: Rows): void {
-    [this.rows, this.chosen, this.current, this.selected, this.anchor] = [rows, null, -1, -1, -1];
+    [this.rows, this.chosen, this.current] = [rows, null, -1];
+    this.place(-1, -1, false);
     const least = rows.columns.map((_, column) => leastWidth(rows, column));
     const widths = rows.columns.map(({ name, isNumber }, i) =>
       i === 0 || name === 'kind' ? `${least[i]}rem` : `minmax(${least[i]}rem, ${isNumber ? 1 : 2}fr)`,
@@ -70,26 +80,36 @@ export class Table {
     for (const element of this.pool) element.remove();
     this.pool = [];
     this.scroller.setAttribute('aria-colcount', String(rows.columns.length));
-    this.scroller.scrollTop = 0;
+    this.scrollTo(0);
     this.resize();
   }
 
   choose(chosen: Uint32Array | null): void {
     this.chosen = chosen;
-    [this.selected, this.anchor] = [-1, -1];
+    this.place(-1, -1, false);
     this.resize();
+    this.scrollTo(this.top);
   }
 
   get shownCount(): number {
     return this.chosen?.length ?? this.rows?.count ?? 0;
   }
 
+  get selectedCount(): number {
+    return this.isSelection ? Math.abs(this.selected - this.anchor) + 1 : 0;
+  }
+
   /// The rows that are selected, or all that are shown.
   *wanted(): Generator<number> {
-    const hasSelection = this.selected >= 0 && this.selected !== this.anchor;
-    const first = hasSelection ? Math.min(this.selected, this.anchor) : 0;
-    const end = hasSelection ? Math.max(this.selected, this.anchor) + 1 : this.shownCount;
+    const first = this.isSelection ? Math.min(this.selected, this.anchor) : 0;
+    const end = this.isSelection ? first + this.selectedCount : this.shownCount;
     for (let place = first; place < end; ++place) yield this.rowAt(place);
+  }
+
+  /// The rows that are selected, or the one at the playhead.
+  wantedHere(): Iterable<number> {
+    if (this.isSelection) return this.wanted();
+    return this.current >= 0 && this.current < this.shownCount ? [this.rowAt(this.current)] : [];
   }
 
   /// Marks the row that holds at the playhead; keeps it in sight where `follows`.
@@ -101,11 +121,17 @@ export class Table {
     this.draw();
   }
 
-  select(row: number): void {
+  /// Marks a row that the reader went to.
+  visit(row: number): void {
     const place = this.placeOf(row);
-    [this.selected, this.anchor] = [place, place];
+    this.place(place, place, false);
     this.reveal(place);
     this.draw();
+  }
+
+  private place(selected: number, anchor: number, isSelection: boolean): void {
+    [this.selected, this.anchor, this.isSelection] = [selected, anchor, isSelection];
+    this.onSelect();
   }
 
   refresh(): void {
@@ -146,20 +172,42 @@ export class Table {
     return whole <= tallest ? 1 : (whole - room) / (tallest - room);
   }
 
+  private scrollTo(top: number): void {
+    const { scroller, density } = this;
+    this.top = Math.max(0, Math.min(top, this.shownCount * this.rowHeight - this.room));
+    scroller.scrollTop = this.top / density;
+    this.barTop = scroller.scrollTop;
+  }
+
+  /// By the scroll bar or the browser: it says where to be as exactly as it can.
+  private scrolled(): void {
+    const { scrollTop } = this.scroller;
+    if (scrollTop !== this.barTop) [this.barTop, this.top] = [scrollTop, scrollTop * this.density];
+    this.draw();
+  }
+
+  /// In a table that is too long for the browser a pixel of the scroll bar is many rows, but not a pixel of the wheel.
+  private wheel(event: WheelEvent): void {
+    if (this.density === 1 || event.ctrlKey || event.shiftKey || Math.abs(event.deltaX) > Math.abs(event.deltaY)) return;
+    event.preventDefault();
+    const unit = [1, 16, this.room][event.deltaMode] ?? 1;
+    measured('zulm:table', () => {
+      this.scrollTo(this.top + event.deltaY * unit);
+      this.draw();
+    });
+  }
+
   private reveal(place: number): void {
-    const { scroller, density, room } = this;
-    const top = scroller.scrollTop * density;
+    const { top, room } = this;
     const y = place * this.rowHeight;
     if (room <= 0 || (y >= top && y + this.rowHeight <= top + room)) return;
     const isNear = y > top - room && y < top + 2 * room;
-    const target = isNear ? (y < top ? y : y + this.rowHeight - room) : y - room / 2;
-    scroller.scrollTop = Math.max(0, target) / density;
+    this.scrollTo(isNear ? (y < top ? y : y + this.rowHeight - room) : y - room / 2);
   }
 
   private draw(): void {
-    const { rows, scroller } = this;
+    const { rows, scroller, top } = this;
     if (!rows || this.room <= 0) return;
-    const top = scroller.scrollTop * this.density;
     const first = Math.max(0, Math.floor(top / this.rowHeight) - 4);
     const end = Math.min(this.shownCount, first + Math.ceil(this.room / this.rowHeight) + 9);
     while (this.pool.length < end - first) this.pool.push(this.newRow(rows.columns));
@@ -200,10 +248,10 @@ export class Table {
     const element = (event.target as Element).closest<HTMLElement>('.table-row');
     if (element?.dataset.row === undefined || !this.rows) return;
     const row = Number(element.dataset.row);
-    this.selected = this.placeOf(row);
-    if (!event.shiftKey) this.anchor = this.selected;
-    this.draw();
+    const place = this.placeOf(row);
     if (!event.shiftKey) this.onActivate(row);
+    this.place(place, event.shiftKey && this.anchor >= 0 ? this.anchor : place, true);
+    this.draw();
   }
 
   private press(event: KeyboardEvent): void {
@@ -219,13 +267,15 @@ export class Table {
       End: last,
     };
     if (event.key === 'Enter' && this.selected >= 0) this.onActivate(this.rowAt(this.selected));
+    else if (event.key === 'Escape' && this.isSelection) this.place(-1, -1, false);
+    else if (event.key === 'a' && (event.ctrlKey || event.metaKey) && last >= 0) this.place(last, 0, true);
     else if (event.key in places && last >= 0) {
-      this.selected = Math.max(0, Math.min(places[event.key]!, last));
-      if (!event.shiftKey || this.anchor < 0) this.anchor = this.selected;
-      this.reveal(this.selected);
-      this.draw();
-      this.draw(); // once more where scrolling brought other rows
+      const place = Math.max(0, Math.min(places[event.key]!, last));
+      this.place(place, event.shiftKey && this.anchor >= 0 ? this.anchor : place, true);
+      this.reveal(place);
     } else return;
+    this.draw();
+    this.draw(); // once more where scrolling brought other rows
     event.preventDefault();
     event.stopPropagation();
   }

@@ -1,7 +1,9 @@
 // What is known of a recording as a whole, and what is wrong with it.
 
 import type { StreamSummary } from '#decoder';
-import { brief, bytes, clock, count, plural, titleOf } from '../model/format';
+import { doubtsAbout } from '../model/checks';
+import { brief, bytes, clock, count, memoryText, plural, shown, titleOf } from '../model/format';
+import type { Size } from '../model/geometry';
 import { idleTime } from '../model/idle';
 import type { Finding, Session } from '../model/session';
 import { byId, make } from '../ui/dom';
@@ -14,7 +16,7 @@ function section(title: string, ...content: Node[]): HTMLElement {
 }
 
 function list(facts: Fact[]): HTMLElement {
-  return make('dl', {}, ...facts.flatMap(([name, value]) => [make('dt', {}, name), make('dd', {}, value)]));
+  return make('dl', {}, ...facts.flatMap(([name, value]) => [make('dt', {}, shown(name)), make('dd', {}, shown(value))]));
 }
 
 export function showFacts(session: Session, duration: number): void {
@@ -81,7 +83,7 @@ function machineFacts(session: Session): Fact[] {
   if (!track || track.count === 0) return [];
   return Object.entries(machineNames).map(([column, name]) => [
     name,
-    track.text(column, 0).replace(/^[A-Za-z]+:/, '') || '–',
+    memoryText(track.text(column, 0).replace(/^[A-Za-z]+:/, '')) || '–',
   ]);
 }
 
@@ -130,9 +132,9 @@ function sentence(finding: Finding): string {
   return typeof text === 'string' ? text : JSON.stringify(finding);
 }
 
-/// What `verify` found.
-export function showCheck(session: Session): void {
-  const findings = allFindings(session);
+/// What `verify` found, and what else is doubtful.
+export function showCheck(session: Session, movie: Size | undefined): void {
+  const findings = [...allFindings(session), ...doubtsAbout(session, movie)];
   const isDamaged = session.verify.damaged === true;
   const verdict = make(
     'p',
@@ -158,8 +160,8 @@ export function showCheck(session: Session): void {
     return make(
       'li',
       { class: `finding is-${finding.severity ?? 'notice'}` },
-      make('p', { class: 'quiet' }, place),
-      make('p', {}, sentence(finding)),
+      make('p', { class: 'quiet' }, shown(place)),
+      make('p', {}, shown(sentence(finding))),
     );
   });
   byId('pane-verify').replaceChildren(
@@ -169,6 +171,7 @@ export function showCheck(session: Session): void {
   );
   const badge = byId('finding-count');
   badge.hidden = findings.length === 0;
+  badge.classList.toggle('is-bad', isDamaged);
   badge.textContent = String(findings.length);
 }
 

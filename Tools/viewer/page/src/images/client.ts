@@ -1,5 +1,6 @@
 // Cursor images as the page draws them. Browsers know PNG; TIFF is decoded in a worker, one picture at a time.
 
+import { requireDrawablePNG } from './png';
 import type { Pixels } from './tiff';
 import ImageWorker from './worker?worker&inline';
 
@@ -39,9 +40,12 @@ function decodedTIFF(bytes: Uint8Array): Promise<Pixels> {
   return answer;
 }
 
-/// Rejects what is no picture.
+/// Rejects what is neither PNG nor TIFF, and what is larger than any cursor.
 export async function bitmapOf(bytes: Uint8Array): Promise<ImageBitmap> {
-  if (!isTIFF(bytes)) return createImageBitmap(new Blob([bytes as BlobPart]));
+  if (!isTIFF(bytes)) {
+    requireDrawablePNG(bytes);
+    return createImageBitmap(new Blob([bytes as BlobPart]));
+  }
   const { width, height, data } = await decodedTIFF(bytes);
   return createImageBitmap(new ImageData(data, width, height));
 }

@@ -1,6 +1,7 @@
 // Pictures out of TIFF files, which browsers do not show. Cursor images may be such files.
 
 import { decode, type TiffIfd } from 'tiff';
+import { requireCursorSize } from './size';
 
 /// Straight alpha, row by row.
 export interface Pixels {
@@ -9,7 +10,6 @@ export interface Pixels {
   data: Uint8ClampedArray<ArrayBuffer>;
 }
 
-const mostSide = 2048; // pixels: no cursor is larger, and a file that says so only wants memory
 const packBits = 32773;
 
 /// Of the first picture. Throws where the file is damaged, or of a form that is rarer than 8 or 16 bits in rows.
@@ -27,8 +27,7 @@ export function pixelsOfTIFF(bytes: Uint8Array): Pixels {
 
 function requireUsual(header: TiffIfd, size: number): void {
   const { width, height, type, bitsPerSample, compression, stripByteCounts } = header;
-  const isSide = (side: number) => side >= 1 && side <= mostSide;
-  if (!isSide(width) || !isSide(height)) throw new Error(`its size is ${width} × ${height}`);
+  requireCursorSize(width, height);
   if (header.tiled || header.planarConfiguration !== 1) throw new Error('its samples are not in rows');
   if (type !== 1 && type !== 2) throw new Error('it is neither grey nor of red, green and blue');
   const isWide = bitsPerSample === 16 && compression !== packBits;

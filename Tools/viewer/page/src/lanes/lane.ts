@@ -10,6 +10,8 @@ export interface Lane {
   title: string;
   /// Of a stream that no reader finds.
   isHidden?: boolean;
+  /// What each colour of its lines stands for.
+  legend?: { text: string; colour: 'accent' | 'second' }[];
   /// In pixels of the page.
   height: number;
   draw(canvas: LaneCanvas): void;
@@ -152,6 +154,8 @@ export interface Band {
   end: number;
   text: string;
   colour: string;
+  /// Of its outline, which can be told from the page.
+  edge: string;
 }
 
 /// Bands with names, which are cut where they do not fit, or left out where `isWhole`. What is narrower than two pixels
@@ -167,14 +171,17 @@ export function drawBands(
   context.font = `500 11px ${palette.font}`;
   context.textBaseline = 'middle';
   for (let i = Math.max(0, countUntil(times, canvas.range.from) - 1); i < end;) {
-    const { start, end: stop, text, colour } = band(i);
+    const { start, end: stop, text, colour, edge } = band(i);
     const x = Math.max(-4, canvas.x(start));
     const right = Math.min(canvas.width + 4, canvas.x(stop));
     const width = Math.max(1, right - x - 1);
     context.fillStyle = colour;
     context.beginPath();
-    context.roundRect(x, canvas.top + 3, width, canvas.height - 6, Math.min(3, width / 2));
+    context.roundRect(x + 0.5, canvas.top + 3.5, Math.max(0.5, width - 1), canvas.height - 7, Math.min(3, width / 2));
     context.fill();
+    context.strokeStyle = edge;
+    context.lineWidth = 1;
+    context.stroke();
     const room = { left: Math.max(0, x) + 6, right: right - 7 };
     if (width > 24 && text) drawBandText(canvas, text, room, isWhole);
     i = right - x > 2 ? i + 1 : Math.max(i + 1, countBefore(times, canvas.time(x + 2)));

@@ -4,15 +4,17 @@ import { clickLabel, type Click } from '../model/clicks';
 import { StreamRows } from '../entries/rows';
 import { brief, titleOf } from '../model/format';
 import { keyCap } from '../model/keys';
+import type { Rect } from '../model/geometry';
 import { countBefore, countUntil, lastAt } from '../model/search';
 import { rectAt, type HiddenStream, type Session } from '../model/session';
 import type { Track } from '../model/track';
-import type { Palette } from '../ui/palette';
 import { Extremes } from './extremes';
 import { drawArea, drawBands, drawDensity, drawLine, type Curve, type Lane, type LaneCanvas } from './lane';
 
 export interface LaneOptions {
   showsKeys: () => boolean;
+  /// What of the screen the movie shows.
+  region: () => Rect;
 }
 
 export function lanesOf(session: Session, options: LaneOptions): Lane[] {
@@ -25,7 +27,7 @@ export function lanesOf(session: Session, options: LaneOptions): Lane[] {
     keyLane(session, options),
     scrollLane(session),
     speedLane(session),
-    trailLane(session),
+    trailLane(session, options),
     hoverLane(session),
     opacityLane(session),
     cpuLane(session),
@@ -61,9 +63,9 @@ function filled(session: Session, kind: string): Track | undefined {
 class NameColours {
   private readonly places = new Map<string, number>();
 
-  of(name: string, { bands }: Palette): string {
+  of(name: string): number {
     if (!this.places.has(name)) this.places.set(name, this.places.size);
-    return bands[this.places.get(name)! % bands.length]!;
+    return this.places.get(name)!;
   }
 }
 
@@ -71,16 +73,15 @@ interface BandName {
   text: string;
   index: number;
   time: number;
-  palette: Palette;
 }
 
-/// A band for each entry.
+/// A band for each entry, in one of the colours of bands.
 function bandLane(
   session: Session,
   kind: string,
   title: string,
   textOf: (track: Track, index: number) => string,
-  colourOf: (name: BandName) => string,
+  colourOf: (name: BandName) => number,
 ): Lane | undefined {
   const track = filled(session, kind);
   return (
@@ -90,8 +91,10 @@ function bandLane(
       draw: (canvas) =>
         drawBands(canvas, track.times, (index) => {
           const [time, text] = [track.times[index]!, textOf(track, index)];
-          const colour = colourOf({ text, index, time, palette: canvas.palette });
-          return { start: time, end: track.endOf(index, session.duration), text, colour };
+          const { bands, bandEdges } = canvas.palette;
+          const place = colourOf({ text, index, time }) % bands.length;
+          const end = track.endOf(index, session.duration);
+          return { start: time, end, text, colour: bands[place]!, edge: bandEdges[place]! };
         }),
       valueAt: (time) => {
         const index = track.at(time);
@@ -105,8 +108,8 @@ const textsOf = (column: string) => (track: Track, index: number) => track.text(
 
 function textLane(session: Session, kind: string, column: string, title: string): Lane | undefined {
   const colours = new NameColours();
-  return bandLane(session, kind, title, textsOf(column), ({ text, time, palette }) =>
-    colours.of(appAt(session, time) || text, palette),
+  return bandLane(session, kind, title, textsOf(column), ({ text, time }) =>
+    colours.of(appAt(session, time) || text),
   );
 }
 
@@ -123,7 +126,7 @@ function slideLane(session: Session): Lane | undefined {
     ['slideComment', 'comment'],
   ];
   const [kind, column] = kinds.find(([kind]) => filled(session, kind)) ?? ['', ''];
-  return bandLane(session, kind, 'Slides', textsOf(column), ({ index, palette }) => palette.bands[index % 2]!);
+  return bandLane(session, kind, 'Slides', textsOf(column), ({ index }) => index % 2);
 }
 
 function rectText(track: Track, index: number): string {
@@ -135,7 +138,7 @@ function rectText(track: Track, index: number): string {
 function windowLane(session: Session): Lane | undefined {
   if (filled(session, 'topmostAppName') || filled(session, 'topmostWindowTitle')) return undefined;
   const colours = new NameColours();
-  return bandLane(session, 'topmostWindow', 'Window', rectText, ({ text, palette }) => colours.of(text, palette));
+  return bandLane(session, 'topmostWindow', 'Window', rectText, ({ text }) => colours.of(text));
 }
 
 const roomForClicks = 6; // pixels to a click, from which on each is drawn
@@ -178,9 +181,16 @@ function drawClick(canvas: LaneCanvas, click: Click): void {
     context.globalAlpha = 1;
   }
   context.fillRect(x - 0.75, top + 4, 1.5, height - 8);
-  context.beginPath();
-  context.arc(x, middle, 3, 0, 2 * Math.PI);
-  context.fill();
+  context.fill(clickShape(click.button, x, middle));
+}
+
+/// A disc for the left button, a square for the right one, a triangle for all others.
+function clickShape(button: string, x: number, y: number): Path2D {
+  const shape = new Path2D();
+  if (button === 'left') shape.arc(x, y, 3.5, 0, 2 * Math.PI);
+  else if (button === 'right') shape.rect(x - 3.5, y - 3.5, 7, 7);
+  else for (const [dx, dy] of [[-4.5, 3.5], [4.5, 3.5], [0, -4.5]] as const) shape.lineTo(x + dx, y + dy);
+  return shape;
 }
 
 const roomForKeys = 12; // pixels to a key, from which on each shows what it is
@@ -201,7 +211,7 @@ function keyLane(session: Session, { showsKeys }: LaneOptions): Lane | undefined
     valueAt: (time) => {
       const track = keys();
       const index = track.at(time);
-      return index >= 0 && time - track.times[index]! < 1 ? track.text('label', index) : '';
+      return index >= 0 && time - track.times[index]! < 1 ? keyCap(track.text('label', index)) : '';
     },
   };
 }
@@ -259,7 +269,7 @@ function scrollLane(session: Session): Lane | undefined {
       const index = track.at(time);
       if (index < 0 || time - track.times[index]! > 0.5) return '';
       const [x, y] = [track.number('x', index), track.number('y', index)];
-      return [x && `${x > 0 ? '→' : '←'} ${Math.abs(x)}`, y && `${y > 0 ? '↑' : '↓'} ${Math.abs(y)}`]
+      return [x && `${x > 0 ? '→' : '←'} ${Math.abs(x)} px`, y && `${y > 0 ? '↑' : '↓'} ${Math.abs(y)} px`]
         .filter(Boolean)
         .join('  ');
     },
@@ -294,16 +304,16 @@ function drawScroll(canvas: LaneCanvas, times: Float64Array, extremes: Extremes,
 }
 
 function speedLane(session: Session): Lane | undefined {
-  const track = filled(session, 'cursorLocation');
-  if (!track) return undefined;
-  const values = session.speeds;
-  const curve = curveOf(track, values.map(Math.sqrt), 0, Math.sqrt(usualGreatest(values)));
+  if (!filled(session, 'cursorLocation')) return undefined;
+  const { times, values } = session.speed;
+  const extremes = new Extremes(values.map(Math.sqrt));
+  const curve = { times, extremes, low: 0, high: Math.sqrt(usualGreatest(values)) };
   return {
     title: 'Cursor speed',
     height: 30,
     draw: (canvas) => drawArea(canvas, curve, canvas.palette.accent, 0.28),
     valueAt: (time) => {
-      const index = track.at(time);
+      const index = lastAt(times, time);
       return index >= 0 ? `${Math.round(values[index]!)} px/s` : '';
     },
   };
@@ -313,28 +323,23 @@ function curveOf(track: Track, values: Float32Array, low: number, high: number):
   return { times: track.times, extremes: new Extremes(values), low, high };
 }
 
-function trailLane(session: Session): Lane | undefined {
+function trailLane(session: Session, { region }: LaneOptions): Lane | undefined {
   const track = filled(session, 'cursorLocation');
   if (!track) return undefined;
-  const region = session.region ?? { x: 0, y: 0, width: 1920, height: 1080 };
-  const x = curveOf(
-    track,
-    valuesOf(track, (i) => track.number('x', i)),
-    region.x,
-    region.x + region.width,
-  );
-  const y = curveOf(
-    track,
-    valuesOf(track, (i) => -track.number('y', i)),
-    -(region.y + region.height),
-    -region.y,
-  );
+  const xs = new Extremes(valuesOf(track, (i) => track.number('x', i)));
+  const ys = new Extremes(valuesOf(track, (i) => -track.number('y', i)));
   return {
-    title: 'Cursor x, y',
+    title: 'Cursor',
+    legend: [
+      { text: 'x', colour: 'accent' },
+      { text: 'y', colour: 'second' },
+    ],
     height: 32,
     draw: (canvas) => {
-      drawLine(canvas, x, canvas.palette.accent);
-      drawLine(canvas, y, canvas.palette.second);
+      const { x, y, width, height } = region();
+      const { times } = track;
+      drawLine(canvas, { times, extremes: xs, low: x, high: x + width }, canvas.palette.accent);
+      drawLine(canvas, { times, extremes: ys, low: -(y + height), high: -y }, canvas.palette.second);
     },
     valueAt: (time) => {
       const index = track.at(time);
@@ -369,6 +374,7 @@ function hoverLane(session: Session): Lane | undefined {
           end: times[index + 1] ?? session.duration,
           text: texts[index]!,
           colour: index % 2 ? canvas.palette.line : canvas.palette.grid,
+          edge: canvas.palette.edge,
         }),
         true,
       ),
@@ -406,7 +412,9 @@ function cpuLane(session: Session): Lane | undefined {
     draw: (canvas) => drawArea(canvas, curve, canvas.palette.second, 0.22),
     valueAt: (time) => {
       const index = track.at(time);
-      return index >= 0 ? brief(Math.round(track.number('cpuUsage', index) * 100) / 100) : '';
+      if (index < 0) return '';
+      const percent = track.number('cpuUsage', index) * (high === 1 ? 100 : 1);
+      return `${brief(Math.round(percent * 10) / 10)} %`;
     },
   };
 }

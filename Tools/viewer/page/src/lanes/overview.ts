@@ -36,9 +36,8 @@ export class Overview {
 
   show(session: Session, duration: number): void {
     if (session !== this.session) {
-      const track = session.track('cursorLocation');
-      const values = session.speeds.map(Math.sqrt);
-      this.curve = track && { times: track.times, extremes: new Extremes(values), low: 0, high: 70 };
+      const { times, values } = session.speed;
+      this.curve = { times, extremes: new Extremes(values.map(Math.sqrt)), low: 0, high: 70 };
     }
     [this.session, this.duration, this.isStale] = [session, duration, true];
   }
@@ -68,9 +67,13 @@ export class Overview {
     context.setTransform(ratio, 0, 0, ratio, 0, 0);
     context.clearRect(0, 0, width, height);
     const canvas = new LaneCanvas(context, palette(), { from: 0, to: this.duration }, width, 2, height - 4);
-    context.fillStyle = palette().idle;
-    for (const { start, end } of this.session?.idle ?? [])
-      context.fillRect(canvas.x(start), 0, Math.max(1, canvas.x(end) - canvas.x(start)), height);
+    for (const { start, end } of this.session?.idle ?? []) {
+      const [x, wide] = [canvas.x(start), Math.max(1, canvas.x(end) - canvas.x(start))];
+      context.fillStyle = palette().idle;
+      context.fillRect(x, 0, wide, height);
+      context.fillStyle = palette().edge;
+      context.fillRect(x, 0, wide, 2);
+    }
     if (this.curve) drawArea(canvas, this.curve, palette().faint, 0.35);
     context.fillStyle = palette().accent;
     for (const { start } of this.session?.clicks ?? []) context.fillRect(canvas.x(start), height - 7, 1, 5);

@@ -42,9 +42,17 @@ export class Timeline {
     'aria-valuemin': 0,
   });
   private readonly body = make('div', { class: 'lanes-body' });
+  private readonly scroller = make(
+    'div',
+    { class: 'lanes-scroll', tabindex: 0, role: 'group', 'aria-label': 'Lanes' },
+    this.labels,
+    this.body,
+  );
   private readonly playhead = make('div', { class: 'playhead', 'aria-hidden': 'true' });
   private readonly pointerLine = make('div', { class: 'pointer-line', 'aria-hidden': 'true', hidden: true });
   private readonly tip = make('output', { class: 'tip', 'aria-live': 'off', hidden: true });
+  /// Where the pointer rests.
+  private pointed: PointerEvent | undefined;
   private readonly zoomText = make('span', { class: 'zoom-text' });
 
   constructor(private readonly events: TimelineEvents) {
@@ -55,7 +63,7 @@ export class Timeline {
       move: (x) => this.events.onSeek(this.timeAt(x)),
     });
     this.setUpLanes();
-    new ResizeObserver(() => this.invalidate()).observe(this.body);
+    new ResizeObserver(() => this.resized()).observe(this.body);
   }
 
   private build(): void {
@@ -81,16 +89,10 @@ export class Timeline {
     );
     this.ruler.append(this.rulerCanvas);
     this.body.append(this.lanesCanvas);
-    const scroll = make(
-      'div',
-      { class: 'lanes-scroll', tabindex: 0, role: 'group', 'aria-label': 'Lanes' },
-      this.labels,
-      this.body,
-    );
     root.append(
       make('div', { class: 'timeline-row' }, tools, this.overview.element),
       make('div', { class: 'timeline-row' }, make('div', { class: 'ruler-label' }, 'Time'), this.ruler),
-      scroll,
+      this.scroller,
       make('div', { class: 'playhead-holder', 'aria-hidden': 'true' }, this.pointerLine, this.playhead),
       this.tip,
     );
@@ -102,11 +104,16 @@ export class Timeline {
     this.lanes = lanesOf(session, this.events);
     this.values = this.lanes.map(() => make('span', { class: 'lane-value' }));
     this.labels.replaceChildren(
-      ...this.lanes.map(({ title, height, isHidden }, i) => {
+      ...this.lanes.map(({ title, legend = [], height, isHidden }, i) => {
         const label = make(
           'div',
           { class: isHidden ? 'lane-label is-hidden' : 'lane-label' },
-          make('span', { class: 'lane-title', title }, title),
+          make(
+            'span',
+            { class: 'lane-title', title },
+            title,
+            ...legend.flatMap(({ text, colour }) => [' ', make('span', { class: `legend is-${colour}` }, text)]),
+          ),
           isHidden ? make('span', { class: 'tag' }, 'hidden') : this.values[i]!,
         );
         label.style.height = `${(height + laneGap) / 16}rem`;
@@ -149,6 +156,13 @@ export class Timeline {
     this.setRange({ from: 0, to: this.duration });
   }
 
+  /// By a part of what is in sight.
+  pan(part: number): void {
+    const { from, to } = this.range;
+    const way = part * (to - from);
+    this.setRange({ from: from + way, to: to + way });
+  }
+
   /// Around the playhead where that is in sight.
   zoom(factor: number): void {
     const { from, to } = this.range;
@@ -164,6 +178,13 @@ export class Timeline {
     if (time < from || time > to) this.setRange({ from: time - length * 0.1, to: time + length * 0.9 });
   }
 
+  /// What stands above the lanes is as wide as they are, beside their scroll bar.
+  private resized(): void {
+    const bar = this.scroller.offsetWidth - this.scroller.clientWidth;
+    byId('timeline').style.setProperty('--scroll-bar', `${bar}px`);
+    this.invalidate();
+  }
+
   invalidate(): void {
     this.isStale = true;
     this.shownTime = -1;
@@ -174,7 +195,10 @@ export class Timeline {
   /// Only the playhead moves, until the range is another one.
   draw(time: number): void {
     if (!this.session) return;
-    if (this.isStale) this.drawLanes();
+    if (this.isStale) {
+      this.drawLanes();
+      if (this.pointed) this.point(this.pointed);
+    }
     this.overview.draw(this.range, time);
     this.time = time;
     if (time === this.shownTime) return;
@@ -225,10 +249,8 @@ export class Timeline {
 
   private drawBackground(canvas: LaneCanvas): void {
     const { context, width, height, range } = canvas;
-    context.fillStyle = palette().idle;
     for (const { start, end } of this.session?.idle ?? [])
-      if (end > range.from && start < range.to)
-        context.fillRect(canvas.x(start), 0, canvas.x(end) - canvas.x(start), height);
+      if (end > range.from && start < range.to) drawIdle(canvas, canvas.x(start), canvas.x(end), height);
     context.fillStyle = palette().grid;
     for (const time of ticks(range, tickStep(range, width, 84)))
       context.fillRect(Math.round(canvas.x(time)), 0, 1, height);
@@ -277,29 +299,38 @@ export class Timeline {
     for (const element of [this.body, this.ruler, this.overview.element])
       element.addEventListener('wheel', (event) => this.wheel(event), { passive: false });
     this.body.addEventListener('pointermove', (event) => this.point(event));
-    this.body.addEventListener('pointerleave', () => void (this.pointerLine.hidden = this.tip.hidden = true));
+    this.body.addEventListener('pointerleave', () => this.pointNowhere());
+    this.scroller.addEventListener('scroll', () => this.pointed && this.point(this.pointed));
   }
 
+  /// Alone it scrolls what the browser scrolls.
   private wheel(event: WheelEvent): void {
-    event.preventDefault();
     const lines = event.deltaMode === WheelEvent.DOM_DELTA_LINE ? 16 : 1;
-    const isPan = event.shiftKey || Math.abs(event.deltaX) > Math.abs(event.deltaY);
+    const isZoom = event.ctrlKey || event.metaKey;
+    const isPan = !isZoom && (event.shiftKey || Math.abs(event.deltaX) > Math.abs(event.deltaY));
+    if (!isZoom && !isPan) return;
+    event.preventDefault();
     if (isPan) {
       const way = (event.deltaX || event.deltaY) * lines;
       const shift = (way / Math.max(1, this.width)) * (this.range.to - this.range.from);
       return this.setRange({ from: this.range.from + shift, to: this.range.to + shift });
     }
     const x = event.clientX - this.body.getBoundingClientRect().left;
-    const strength = event.ctrlKey ? 0.01 : 0.0022;
+    const strength = Math.abs(event.deltaY) < 40 ? 0.01 : 0.0022; // fingers on a trackpad, or a notch
     const isOverview = event.currentTarget === this.overview.element;
     const anchor = isOverview ? (x / Math.max(1, this.width)) * this.duration : this.timeAt(x);
     this.setRange(zoomed(this.range, anchor, Math.exp(event.deltaY * lines * strength), this.duration));
   }
 
+  private pointNowhere(): void {
+    this.pointed = undefined;
+    this.pointerLine.hidden = this.tip.hidden = true;
+  }
+
   /// What the lane under the pointer tells at that time.
   private point(event: PointerEvent): void {
-    if (event.pointerType === 'touch' || event.buttons !== 0)
-      return void (this.pointerLine.hidden = this.tip.hidden = true);
+    if (event.pointerType === 'touch' || event.buttons !== 0) return this.pointNowhere();
+    this.pointed = event;
     const box = this.body.getBoundingClientRect();
     const x = event.clientX - box.left;
     const y = (event.clientY - box.top) / uiScale();
@@ -318,4 +349,16 @@ export class Timeline {
     const left = Math.min(event.clientX - root.left + 12, root.width - this.tip.offsetWidth - 8);
     this.tip.style.transform = `translate(${Math.max(4, left)}px, ${event.clientY - root.top - this.tip.offsetHeight - 10}px)`;
   }
+}
+
+const idleEdge = 3; // pixels
+
+/// Shaded, with edges that can be told from the page.
+function drawIdle({ context, width }: LaneCanvas, start: number, end: number, height: number): void {
+  const [left, right] = [Math.max(-1, start), Math.min(width + 1, end)];
+  context.fillStyle = palette().idle;
+  context.fillRect(left, 0, right - left, height);
+  context.fillStyle = palette().edge;
+  context.fillRect(left, 0, right - left, idleEdge);
+  for (const x of [start, end - 1]) context.fillRect(x, 0, 1, height);
 }

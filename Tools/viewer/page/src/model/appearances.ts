@@ -1,7 +1,8 @@
-// What the cursor looked like: an entry without an image shows the one that came with its number before.
+// What the cursor looked like.
 
+import type { Table } from '#decoder';
 import type { Point } from './geometry';
-import type { Track } from './track';
+import { Track } from './track';
 
 export interface Appearance {
   id: string;
@@ -9,22 +10,15 @@ export interface Appearance {
   hotSpot: Point;
 }
 
-const none: Appearance = { id: '', image: new Uint8Array(), hotSpot: { x: 0, y: 0 } };
+const none = new Uint8Array();
 
-/// One for each entry of the track, by time; with an empty image where none has come yet.
-export function cursorAppearances(track: Track | undefined): Appearance[] {
-  const known = new Map<string, Appearance>();
-  const result: Appearance[] = [];
-  for (let i = 0; i < (track?.count ?? 0); ++i) {
-    const id = track!.text('id', i);
-    const image = track!.bytes('image', i);
-    if (image && image.length > 0)
-      known.set(id, {
-        id,
-        image,
-        hotSpot: { x: track!.number('hotspotOffsetX', i), y: track!.number('hotspotOffsetY', i) },
-      });
-    result.push(known.get(id) ?? none);
-  }
-  return result;
+/// Takes what the library knows at the times of the stream: one for each of its entries, by time, with an empty image
+/// if the recording has none.
+export function appearancesIn(states: Table | undefined): Appearance[] {
+  const track = states && new Track(states);
+  return Array.from(track?.times ?? [], (_, i) => ({
+    id: track!.text('cursor_id', i),
+    image: track!.bytes('picture', i) ?? none,
+    hotSpot: { x: track!.number('hotspot_x', i), y: track!.number('hotspot_y', i) },
+  }));
 }

@@ -1,7 +1,8 @@
 // Buttons that went down, until they came up.
 
+import type { Table } from '#decoder';
 import { lastAt } from './search';
-import type { Track } from './track';
+import { Track } from './track';
 
 export interface Click {
   start: number;
@@ -10,27 +11,17 @@ export interface Click {
   modifiers: string[];
 }
 
-const modifierSigns: Record<string, string> = { shift: '⇧', ctrl: '⌃', cmd: '⌘', option: '⌥' };
+const modifierSigns: Record<string, string> = { shift: '⇧', ctrl: '⌃', cmd: '⌘', alt: '⌥' };
 
-export function clicksOf(track: Track | undefined, end: number): Click[] {
-  const clicks: Click[] = [];
-  const held = new Map<string, Click>();
-  for (let i = 0; i < (track?.count ?? 0); ++i) {
-    const [what = '', ...modifiers] = track!.text('action', i).split(' + ');
-    const [button = '', phase] = what.split(' ');
-    const time = track!.times[i]!;
-    if (phase === 'down') {
-      const click = { start: time, end, button, modifiers };
-      held.set(button, click);
-      clicks.push(click);
-    } else if (phase === 'up') {
-      const click = held.get(button);
-      if (click) click.end = time;
-      held.delete(button);
-    }
-  }
-  for (const click of held.values()) click.end = Math.min(click.end, click.start + 1); // never came up
-  return clicks;
+/// Takes the clicks as the library tells them.
+export function clicksIn(table: Table | undefined): Click[] {
+  const track = table && new Track(table);
+  return Array.from(track?.times ?? [], (start, i) => ({
+    start,
+    end: track!.number('end', i),
+    button: track!.text('button', i),
+    modifiers: track!.text('modifiers', i).split('+').filter(Boolean),
+  }));
 }
 
 /// Such as "⇧⌘ left".

@@ -42,6 +42,13 @@ export function bytes(value: number): string {
   return unit === 0 ? plural(value, 'byte') : `${value.toFixed(1)} ${units[unit]}`;
 }
 
+/// Memory such as "24105MB" in gigabytes.
+export function memoryText(text: string): string {
+  const megabytes = /^(\d+)\s*MB$/i.exec(text)?.[1];
+  const gigabytes = Number(megabytes) / 1000;
+  return megabytes ? `${Number(gigabytes.toFixed(gigabytes < 10 ? 1 : 0))} GB` : text;
+}
+
 /// A kind's name as a title: "cursorLocation" is "Cursor location".
 export function titleOf(kind: string): string {
   if (/^[0-9a-f]{8}-/.test(kind)) return kind;
@@ -51,6 +58,17 @@ export function titleOf(kind: string): string {
     .replace(/^cpu\b/, 'CPU');
   return words.charAt(0).toUpperCase() + words.slice(1);
 }
+
+/// A text as it is shown: signs that turn the direction of what follows, or that are not seen, show themselves.
+export function shown(text: string): string {
+  return text.replace(hiding, (sign) => {
+    const code = sign.charCodeAt(0);
+    return code < 0x20 ? String.fromCharCode(0x2400 + code) : `[U+${code.toString(16).toUpperCase().padStart(4, '0')}]`;
+  });
+}
+
+/// All but tabs and ends of lines, which only make room.
+const hiding = /[\0-\x08\v\f\x0e-\x1f\x7f-\x9f\u061c\u200e\u200f\u2028-\u202e\u2066-\u2069\ufeff]/g;
 
 /// A number with as few digits as tell it apart on the screen.
 export function brief(value: number): string {

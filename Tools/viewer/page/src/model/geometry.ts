@@ -20,7 +20,8 @@ export interface Placement {
   frame: Size;
 }
 
-const fallbackFrame: Size = { width: 1280, height: 720 };
+/// What is assumed where neither a movie nor a region says it.
+export const assumedScreen: Size = { width: 1920, height: 1080 };
 
 export function hasArea(size: Size | undefined): size is Size {
   return size !== undefined && size.width > 0 && size.height > 0;
@@ -35,7 +36,7 @@ export function placementOf(region: Rect | undefined, scaleFactor: number, movie
       region,
       frame: hasArea(movie) ? movie : { width: region.width * scale, height: region.height * scale },
     };
-  const frame = hasArea(movie) ? movie : fallbackFrame;
+  const frame = hasArea(movie) ? movie : assumedScreen;
   return { region: { x: 0, y: 0, width: frame.width / scale, height: frame.height / scale }, frame };
 }
 

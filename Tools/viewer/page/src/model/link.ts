@@ -6,5 +6,5 @@ export function timeInLink(hash: string): number | undefined {
 }
 
 export function linkTo(time: number): string {
-  return `#t=${Number(time.toFixed(3))}`;
+  return `#t=${Number(time.toFixed(6))}`; // a shorter one could lead to the picture before
 }

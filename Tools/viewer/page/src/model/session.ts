@@ -1,12 +1,12 @@
 // A recording that has been read: its tracks, and what follows from them.
 
-import type { Entries, StreamSummary } from '#decoder';
-import { cursorAppearances, type Appearance } from './appearances';
-import { clicksOf, type Click } from './clicks';
+import type { Entries, StreamSummary, Table } from '#decoder';
+import { appearancesIn, type Appearance } from './appearances';
+import { clicksIn, type Click } from './clicks';
 import { hasArea, type Point, type Rect } from './geometry';
-import { idleStretches, type Stretch } from './idle';
+import { idleIn, type Stretch } from './idle';
 import { markersOf } from './markers';
-import { speeds } from './speed';
+import { speedOf, type Speed } from './speed';
 import { Track } from './track';
 
 export interface Finding {
@@ -44,7 +44,11 @@ export interface Decoded {
   streams: StreamSummary[];
   entries: Entries[];
   /// The keys as captions show them.
-  keys: { clear: Entries; masked: Entries } | undefined;
+  keys: { clear: Table; masked: Table } | undefined;
+  clicks: Table | undefined;
+  idle: Table | undefined;
+  /// What holds at the times of the stream cursorImage.
+  appearances: Table | undefined;
   hidden: { stream: StreamSummary; entries: Entries | undefined }[];
   info: FileInfo;
   verify: FileCheck;
@@ -67,14 +71,16 @@ export class Session {
   readonly verify: FileCheck;
   readonly region: Rect | undefined;
   readonly scaleFactor: number;
-  /// Seconds that the metadata, or the movie by its own word, lasts.
+  /// Seconds that the movie lasts by its own word.
+  readonly movieDuration: number | undefined;
+  /// Seconds that the movie lasts, or else the metadata.
   readonly duration: number;
   readonly appearances: Appearance[];
   readonly clicks: Click[];
   readonly markers: Float64Array;
   readonly idle: Stretch[];
-  /// Of the cursor, for each of its positions.
-  readonly speeds: Float32Array;
+  /// Of the cursor.
+  readonly speed: Speed;
   private readonly tracks = new Map<string, Track>();
   private readonly clearKeys: Track | undefined;
   private readonly maskedKeys: Track | undefined;
@@ -97,12 +103,14 @@ export class Session {
     }));
     this.region = this.recordedRegion();
     this.scaleFactor = this.lastNumber('recordingScaleFactor', 'scaleFactor') ?? 1;
-    this.duration = this.wholeDuration(decoded.duration);
-    this.appearances = cursorAppearances(this.track('cursorImage'));
-    this.clicks = clicksOf(this.track('cursorAction'), this.duration);
-    this.markers = markersOf(this);
-    this.idle = idleStretches(this);
-    this.speeds = speeds(this.track('cursorLocation'));
+    const { duration } = decoded;
+    this.movieDuration = duration && Number.isFinite(duration) && duration > 0 ? duration : undefined;
+    this.duration = this.wholeDuration();
+    this.appearances = appearancesIn(decoded.appearances);
+    this.clicks = clicksIn(decoded.clicks);
+    this.markers = markersOf(this).filter((time) => time >= 0 && time <= this.duration);
+    this.idle = idleIn(decoded.idle);
+    this.speed = speedOf(this.track('cursorLocation'));
   }
 
   track(kind: string): Track | undefined {
@@ -146,16 +154,22 @@ export class Session {
     return track?.count ? track.number(column, track.count - 1) : undefined;
   }
 
-  private wholeDuration(declared: number | undefined): number {
-    let end = declared && Number.isFinite(declared) && declared > 0 ? declared : 0;
-    for (const { times } of this.tracks.values())
-      if (times.length) end = Math.max(end, Math.min(times[times.length - 1]!, longest));
-    return Math.max(end, shortest);
+  private wholeDuration(): number {
+    return Math.max(this.movieDuration ?? believableEnd([...this.tracks.values()].map(({ times }) => times)), shortest);
   }
 }
 
 const shortest = 0.1; // seconds, so that there is something to show
-const longest = 366 * 86400; // a damaged time must not squeeze everything else into nothing
+const day = 86400; // seconds
+const looked = 64; // times at the end of each stream
+
+/// The last time, without those that lie more than a day, and more than ten times as far as anything else, from the
+/// beginning: a damaged time must not squeeze everything else into nothing.
+export function believableEnd(streams: Float64Array[]): number {
+  const last = streams.flatMap((times) => [...times.subarray(-looked)]).sort((a, b) => a - b);
+  const bad = last.findIndex((time, i) => i > 0 && time > day && time > 10 * Math.max(1, last[i - 1]!));
+  return last[bad > 0 ? bad - 1 : last.length - 1] ?? 0;
+}
 
 export function rectAt(track: Track, index: number): Rect {
   return {

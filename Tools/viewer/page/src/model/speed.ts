@@ -2,16 +2,44 @@
 
 import type { Track } from './track';
 
-/// In units of the screen to a second, on the way to each position from the one before.
-export function speeds(track: Track | undefined): Float32Array {
-  const result = new Float32Array(track?.count ?? 0);
+/// A speed from each of its times on, in units of the screen to a second.
+export interface Speed {
+  times: Float64Array;
+  values: Float32Array;
+}
+
+const sampled = 4096; // distances that the usual one is taken from
+
+/// The distance between two entries that half of all distances do not exceed; 0 if there is none.
+function usualDistance(times: Float64Array): number {
+  const step = Math.max(1, Math.floor(times.length / sampled));
+  const distances: number[] = [];
+  for (let i = 1; i < times.length; i += step) distances.push(times[i]! - times[i - 1]!);
+  return distances.sort((a, b) => a - b)[distances.length >> 1] ?? 0;
+}
+
+/// Positions that stay the same are not recorded: after more than twice the usual distance the cursor has rested, and
+/// has moved within the last usual distance.
+export function speedOf(track: Track | undefined): Speed {
   const [x, y] = [track?.column('x'), track?.column('y')];
-  if (!track || !x || !y) return result;
-  for (let i = 1; i < result.length; ++i) {
+  if (!track || !x || !y) return { times: new Float64Array(), values: new Float32Array() };
+  const { times, count } = track;
+  const usual = usualDistance(times);
+  const starts = new Float64Array(2 * count);
+  const values = new Float32Array(2 * count);
+  let used = 0;
+  const add = (time: number, value: number) => {
+    starts[used] = time;
+    values[used++] = Number.isFinite(value) ? value : 0;
+  };
+  for (let i = 1; i < count; ++i) {
     const [row, before] = [track.row(i), track.row(i - 1)];
-    const passed = track.times[i]! - track.times[i - 1]!;
+    const passed = times[i]! - times[i - 1]!;
     const way = Math.hypot(Number(x[row]) - Number(x[before]), Number(y[row]) - Number(y[before]));
-    if (passed > 0 && Number.isFinite(way)) result[i] = way / passed;
+    const rested = passed > 2 * usual;
+    if (rested) add(times[i - 1]!, 0);
+    if (passed > 0) add(rested ? times[i]! - usual : times[i - 1]!, way / (rested ? usual : passed));
   }
-  return result;
+  if (count > 0) add(times[count - 1]!, 0);
+  return { times: starts.slice(0, used), values: values.slice(0, used) };
 }

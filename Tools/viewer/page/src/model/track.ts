@@ -1,6 +1,7 @@
 // One stream's entries in the order of their times.
 
-import type { Column, Entries } from '#decoder';
+import type { Table } from '#decoder';
+import { shown } from './format';
 import { lastAt } from './search';
 
 export class Track {
@@ -10,7 +11,7 @@ export class Track {
   /// The rows of the stream, by time; null where the stream is in that order itself.
   private readonly order: Uint32Array | null;
 
-  constructor(readonly entries: Entries) {
+  constructor(readonly entries: Table) {
     this.kind = entries.kind;
     this.order = isSorted(entries.time) ? null : orderOf(entries.time);
     this.times = this.order ? Float64Array.from(this.order, (row) => entries.time[row]!) : entries.time;
@@ -25,7 +26,7 @@ export class Track {
     return this.order ? this.order[index]! : index;
   }
 
-  column(name: string): Column | undefined {
+  column(name: string): Table['columns'][string] | undefined {
     return this.entries.columns[name];
   }
 
@@ -34,9 +35,10 @@ export class Track {
     return typeof value === 'bigint' ? Number(value) : typeof value === 'number' ? value : NaN;
   }
 
+  /// As it is shown.
   text(name: string, index: number): string {
     const value = this.entries.columns[name]?.[this.row(index)];
-    return value === null || value === undefined ? '' : String(value);
+    return value === null || value === undefined ? '' : shown(String(value));
   }
 
   bytes(name: string, index: number): Uint8Array | null {

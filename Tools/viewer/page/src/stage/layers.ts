@@ -28,7 +28,7 @@ export type LayerId = 'cursor' | 'trail' | 'clicks' | 'captions' | 'hover' | 'wi
 export const layers: Layer[] = [
   { id: 'cursor', name: 'Cursor', key: '1', isOn: true },
   { id: 'clicks', name: 'Clicks', key: '2', isOn: true },
-  { id: 'captions', name: 'Keystrokes', key: '3', isOn: true },
+  { id: 'captions', name: 'Keys', key: '3', isOn: true },
   { id: 'trail', name: 'Trail', key: '4', isOn: true },
   { id: 'window', name: 'Window on top', key: '5', isOn: true },
   { id: 'hover', name: 'Hover rectangle', key: '6', isOn: false },

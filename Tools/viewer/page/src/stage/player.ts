@@ -1,21 +1,44 @@
-// Time that goes on: by the movie where there is one, by the clock where there is none or it has ended.
+// Time that goes on: by the pictures of the movie where there is one, by the clock where there is none or it has ended.
+
+import type { Size } from '../model/geometry';
+import { FrameLengths, inside, nextFrame, previousFrame } from './frames';
 
 export type MovieState = 'none' | 'loading' | 'ready' | 'failed';
 
-const usualFrame = 1 / 30; // seconds, until the movie has shown shorter ones
+const rounding = 0.000001; // seconds that browsers round times of pictures by
+const patience = 200; // milliseconds for a picture after the movie has found its place
+const calm = 0.1; // seconds without another picture, after which time goes on without it
+const slow = 0.05; // seconds: pictures that last longer are not all that moves
 
 export class Player {
   playing = false;
   movie: MovieState = 'none';
   /// Told about everything but the passing of time.
   onChange: () => void = () => {};
+  /// Told as soon as the movie shows another picture, before the page is drawn.
+  onPicture: () => void = () => {};
   private position = 0;
-  private wanted: number | undefined;
   private lastTick = 0;
   private length = 0;
+  private isGuessed = false;
   private speed = 1;
-  private shortestFrame = usualFrame;
-  private lastPicture = NaN;
+  private lengths = new FrameLengths();
+  /// When the picture that is shown begins; NaN until there is one.
+  private picture = NaN;
+  /// When it was drawn, in milliseconds of the page, and how many pictures the browser had left out by then.
+  private shownAt = 0;
+  private droppedBefore = 0;
+  /// Where the movie is to go, and where it is on its way to; undefined while it goes nowhere.
+  private wanted: number | undefined;
+  private sought: number | undefined;
+  private hasSought = false;
+  private arrived: (() => void)[] = [];
+  private timer: ReturnType<typeof setTimeout> | undefined;
+  private steps = 0;
+  private isStepping = false;
+  /// The number of times that the reader went somewhere.
+  private journeys = 0;
+  private followsPicture = false;
 
   constructor(readonly video: HTMLVideoElement) {
     this.watchFrames();
@@ -26,17 +49,15 @@ export class Player {
     video.addEventListener('loadeddata', () => this.onChange());
   }
 
-  /// Seconds from one picture of the movie to the next, as far as it has been seen.
-  get frameLength(): number {
-    return this.shortestFrame;
-  }
-
-  /// `duration` is what the metadata lasts; a longer movie makes it more.
-  load(url: string | null, duration: number): void {
+  /// `duration` is what the movie says that it lasts, or what the metadata lasts if `isGuessed`.
+  load(url: string | null, duration: number, isGuessed: boolean): void {
     this.pause();
-    [this.position, this.wanted, this.length] = [0, undefined, duration];
-    [this.shortestFrame, this.lastPicture] = [usualFrame, NaN];
+    this.isGuessed = isGuessed;
+    [this.position, this.length, this.steps, this.followsPicture] = [0, duration, 0, false];
+    ++this.journeys;
+    [this.lengths, this.picture] = [new FrameLengths(), NaN];
     this.movie = url === null ? 'none' : 'loading';
+    this.arrive();
     if (url === null) this.video.removeAttribute('src');
     else this.video.src = url;
     this.video.load();
@@ -44,11 +65,23 @@ export class Player {
   }
 
   get duration(): number {
-    return Math.max(this.length, this.movieLength());
+    const length = this.movieLength();
+    return this.isGuessed && length > 0 ? length : Math.max(this.length, length);
+  }
+
+  /// The size of the movie's pictures, where they can be shown.
+  get size(): Size | undefined {
+    const { videoWidth: width, videoHeight: height } = this.video;
+    return this.movie === 'ready' ? { width, height } : undefined;
   }
 
   get time(): number {
     return this.position;
+  }
+
+  /// Whether the movie shows the picture of `time`.
+  get isSettled(): boolean {
+    return this.movie !== 'loading' && this.wanted === undefined && !this.isStepping;
   }
 
   get rate(): number {
@@ -73,7 +106,7 @@ export class Player {
   play(): void {
     if (this.playing) return;
     if (this.position >= this.duration - 0.01) this.seek(0);
-    this.playing = true;
+    [this.playing, this.followsPicture] = [true, true];
     this.lastTick = performance.now();
     this.playMovie();
     this.onChange();
@@ -92,9 +125,23 @@ export class Player {
   }
 
   seek(time: number): void {
-    this.position = Math.max(0, Math.min(time, this.duration));
-    if (this.movie === 'ready') this.seekMovie(Math.min(this.position, this.movieLength()));
+    this.position = this.limited(time);
+    [this.steps, this.followsPicture] = [0, this.playing];
+    ++this.journeys;
+    if (this.movie === 'ready') this.seekMovie(inside(this.position));
     if (this.playing) this.playMovie();
+    this.onChange();
+  }
+
+  /// To the next picture or the one before. Where the movie has none, by as long as a picture lasts.
+  stepFrame(direction: 1 | -1): void {
+    this.pause();
+    const expected = this.limited(this.position + direction * this.lengths.length);
+    if (this.movie !== 'ready' || Number.isNaN(this.picture) || this.position > this.movieLength())
+      return this.seek(expected);
+    this.position = expected; // until the movie has shown it
+    this.steps += direction;
+    if (!this.isStepping) void this.takeSteps();
     this.onChange();
   }
 
@@ -103,20 +150,75 @@ export class Player {
     const passed = (now - this.lastTick) / 1000;
     this.lastTick = now;
     if (!this.playing) return;
-    if (this.isMovieRunning()) this.position = this.video.currentTime;
+    if (this.isMovieRunning()) this.position = this.runningTime(now);
     else if (this.wanted === undefined) this.position += Math.max(0, passed) * this.speed;
     if (this.position < this.duration) return;
     this.position = this.duration;
     this.pause();
   }
 
+  private limited(time: number): number {
+    return Math.max(0, Math.min(time, this.duration));
+  }
+
+  /// What is drawn belongs to the picture, in which much may move if it lasts long. Where the movie has no other picture
+  /// for a while, time goes on alone; but not where the browser only has no time to show it.
+  private runningTime(now: number): number {
+    const { currentTime } = this.video;
+    const { length } = this.lengths;
+    if (Number.isNaN(this.picture)) return currentTime; // the browser does not tell
+    const isStill = (now - this.shownAt) / 1000 > Math.max(calm, 3 * length) && this.dropped() === this.droppedBefore;
+    if (isStill) return Math.max(this.picture, currentTime);
+    const most = length > slow ? 0.95 * length : 0;
+    return this.picture + Math.max(rounding, Math.min(currentTime - this.picture, most));
+  }
+
+  private dropped(): number {
+    return this.video.getVideoPlaybackQuality?.().droppedVideoFrames ?? 0;
+  }
+
+  private async takeSteps(): Promise<void> {
+    this.isStepping = true;
+    await this.arrival();
+    while (this.steps !== 0) await this.takeStep();
+    this.isStepping = false;
+    this.onChange();
+  }
+
+  private async takeStep(): Promise<void> {
+    const direction = Math.sign(this.steps);
+    const { journeys, lengths, picture } = this;
+    this.steps -= direction;
+    const show = async (time: number) => {
+      if (journeys !== this.journeys) return NaN;
+      this.seekMovie(time);
+      await this.arrival();
+      return journeys === this.journeys ? this.picture : NaN;
+    };
+    const end = this.movieLength();
+    const found = direction > 0 ? await nextFrame(picture, end, lengths, show) : await previousFrame(picture, lengths, show);
+    if (journeys !== this.journeys || this.steps !== 0) return;
+    const isBeyond = direction > 0 && found === undefined && this.duration > end + lengths.length;
+    if (!isBeyond) this.position = this.limited((found ?? picture) + rounding);
+    this.onChange();
+  }
+
   private watchFrames(): void {
     this.video.requestVideoFrameCallback?.((_, { mediaTime }) => {
-      const passed = Math.abs(mediaTime - this.lastPicture);
-      if (passed > 1 / 250 && passed < 0.98 * this.shortestFrame) this.shortestFrame = passed;
-      this.lastPicture = mediaTime;
+      this.showsPicture(mediaTime);
       this.watchFrames();
     });
+  }
+
+  private showsPicture(began: number): void {
+    if (this.isMovieRunning()) this.lengths.played(this.picture, began);
+    this.picture = began;
+    [this.shownAt, this.droppedBefore] = [performance.now(), this.dropped()];
+    this.hasSought = true;
+    if (this.followsPicture && this.wanted === undefined && !this.video.ended)
+      this.position = this.limited(began + rounding);
+    if (this.wanted !== undefined && !this.video.seeking) this.arriveOrGoOn();
+    this.onPicture();
   }
 
   private movieLength(): number {
@@ -124,7 +226,9 @@ export class Player {
   }
 
   private isMovieRunning(): boolean {
-    return this.movie === 'ready' && this.wanted === undefined && !this.video.ended && !this.video.paused;
+    return (
+      this.movie === 'ready' && this.playing && this.wanted === undefined && !this.video.ended && !this.video.paused
+    );
   }
 
   private playMovie(): void {
@@ -135,29 +239,52 @@ export class Player {
 
   /// One at a time: while the movie looks for a picture, only the last wish counts.
   private seekMovie(time: number): void {
-    const isBusy = this.wanted !== undefined;
-    this.wanted = time;
-    if (!isBusy) this.video.currentTime = time;
+    this.wanted = Math.min(time, this.movieLength());
+    if (this.sought === undefined) this.goOn();
+  }
+
+  private goOn(): void {
+    clearTimeout(this.timer);
+    this.sought = this.wanted!;
+    this.hasSought = false;
+    this.video.currentTime = this.sought;
   }
 
   private seeked(): void {
-    const { wanted } = this;
-    if (wanted !== undefined && Math.abs(this.video.currentTime - wanted) > 0.0005 && wanted < this.movieLength())
-      this.video.currentTime = wanted;
-    else this.wanted = undefined;
+    if (this.sought === undefined) return;
+    if (this.wanted !== this.sought || this.hasSought) return this.arriveOrGoOn();
+    clearTimeout(this.timer);
+    this.timer = setTimeout(() => this.arriveOrGoOn(), patience); // not every browser shows the same picture again
+  }
+
+  private arriveOrGoOn(): void {
+    if (this.wanted !== this.sought) return this.goOn();
+    this.arrive();
     this.onChange();
+  }
+
+  private arrive(): void {
+    clearTimeout(this.timer);
+    [this.wanted, this.sought] = [undefined, undefined];
+    for (const tell of this.arrived.splice(0)) tell();
+  }
+
+  /// When the movie goes nowhere any more.
+  private arrival(): Promise<void> {
+    return this.wanted === undefined ? Promise.resolve() : new Promise((done) => this.arrived.push(done));
   }
 
   private movieLoaded(): void {
     this.movie = this.video.videoWidth > 0 ? 'ready' : 'failed';
-    if (this.movie === 'ready' && this.position > 0) this.seekMovie(Math.min(this.position, this.movieLength()));
+    if (this.movie === 'ready' && this.position > 0) this.seekMovie(inside(this.position));
     if (this.playing) this.playMovie();
     this.onChange();
   }
 
   private movieFailed(): void {
     if (!this.video.hasAttribute('src')) return;
-    [this.movie, this.wanted] = ['failed', undefined];
+    this.movie = 'failed';
+    this.arrive();
     this.onChange();
   }
 

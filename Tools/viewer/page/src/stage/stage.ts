@@ -1,6 +1,6 @@
 // The movie, and what was recorded drawn over it.
 
-import { fitted, placementOf, type Placement, type Size } from '../model/geometry';
+import { fitted, placementOf, type Placement } from '../model/geometry';
 import { heatHeight, heatOf, heatWidth } from '../model/heat';
 import { captionAt, captionText, keyCap, type CaptionPart } from '../model/keys';
 import type { Session } from '../model/session';
@@ -35,6 +35,7 @@ export class Stage {
   private width = 0;
   private readonly element = byId('stage');
   private readonly frame = byId('frame');
+  private readonly picture = byId<HTMLCanvasElement>('picture');
   private readonly canvas = byId<HTMLCanvasElement>('overlay');
   private readonly caption = byId('caption');
 
@@ -53,9 +54,7 @@ export class Stage {
   /// Gives the frame the shape of the movie, or of the recorded region where there is none.
   lay(): void {
     if (!this.session) return;
-    const { video, movie } = this.player;
-    const size: Size | undefined =
-      movie === 'ready' ? { width: video.videoWidth, height: video.videoHeight } : undefined;
+    const { movie, size } = this.player;
     this.placement = placementOf(this.session.region, this.session.scaleFactor, size);
     const place = fitted(this.placement.frame, {
       width: this.element.clientWidth,
@@ -69,9 +68,20 @@ export class Stage {
     });
     this.width = place.width;
     this.frame.classList.toggle('has-movie', movie === 'ready');
+    fitCanvas(this.picture, place.width, place.height);
     fitCanvas(this.canvas, place.width, place.height);
+    this.drawPicture();
     this.shownCaption = '';
     this.draw(this.player.time);
+  }
+
+  /// Draws the movie's picture onto a canvas: the browser shows both canvases at once, but the movie itself when it likes.
+  drawPicture(): void {
+    const { video, movie } = this.player;
+    if (movie !== 'ready' || !('requestVideoFrameCallback' in video)) return void (this.picture.hidden = true);
+    if (video.readyState < HTMLMediaElement.HAVE_CURRENT_DATA) return; // the picture before stays
+    this.picture.hidden = false;
+    this.picture.getContext('2d', { alpha: false })?.drawImage(video, 0, 0, this.picture.width, this.picture.height);
   }
 
   /// The heat map tells of this range of time.
@@ -104,6 +114,7 @@ export class Stage {
 
   private drawLayers(context: CanvasRenderingContext2D, scene: Scene): void {
     const isOn = (id: LayerId) => layers.some((layer) => layer.id === id && layer.isOn);
+    byId('heat-legend').hidden = !isOn('heat');
     if (isOn('heat')) drawHeat(context, scene, this.heatPicture());
     if (isOn('window')) drawWindow(context, scene);
     if (isOn('hover')) drawHover(context, scene);
@@ -133,7 +144,7 @@ export class Stage {
     const text = captionText(parts);
     if (text === this.shownCaption) return;
     this.shownCaption = text;
-    this.caption.style.fontSize = `${Math.max(12, Math.min(34, this.width * 0.024))}px`;
+    this.caption.style.fontSize = `${Math.max(12 * uiScale(), Math.min(34, this.width * 0.024))}px`;
     this.caption.hidden = parts.length === 0;
     this.caption.dataset.text = text;
     this.caption.replaceChildren(...parts.map(captionPart));

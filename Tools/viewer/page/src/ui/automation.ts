@@ -11,6 +11,8 @@ export interface ViewerState {
   time: number;
   duration: number;
   playing: boolean;
+  /// Whether the picture of `time` is shown.
+  isSettled: boolean;
   movie: string;
   frame: { width: number; height: number };
   /// In pixels of the movie.
@@ -35,6 +37,7 @@ function stateOf({ session, player, stage, finished }: Page): ViewerState {
     time: player.time,
     duration: player.duration,
     playing: player.playing,
+    isSettled: player.isSettled,
     movie: player.movie,
     frame: stage.placement.frame,
     hotSpot: position ? screenToVideo(position, stage.placement) : null,

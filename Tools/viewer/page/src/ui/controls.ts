@@ -1,6 +1,6 @@
 // The buttons below the movie.
 
-import { clock } from '../model/format';
+import { clock, spokenTime } from '../model/format';
 import { layers } from '../stage/layers';
 import { byId, make, setText } from './dom';
 import { setIcon } from './icons';
@@ -24,7 +24,10 @@ export function setUpControls(page: Page): Controls {
   on('sound', () => (page.player.muted = !page.player.muted));
   on('keys-button', () => page.switchKeys());
   on('full-screen', () => void switchFullScreen());
+  const scrubber = byId<HTMLInputElement>('scrubber');
+  scrubber.addEventListener('input', () => page.seek(scrubber.valueAsNumber));
   byId('frame').addEventListener('click', () => page.player.toggle());
+  document.addEventListener('fullscreenchange', () => showTime(page.player.time, page.player.duration));
   const boxes = setUpLayers(page);
   return { showState: () => showState(page, boxes), showTime };
 }
@@ -55,11 +58,10 @@ function setUpLayers(page: Page): HTMLInputElement[] {
   document.addEventListener('pointerdown', (event) => {
     if (!(event.target as Element).closest('.menu-holder')) show(false);
   });
-  menu.parentElement!.addEventListener('keydown', (event) => {
+  document.addEventListener('keydown', (event) => {
     if (event.key !== 'Escape' || menu.hidden) return;
+    if (menu.contains(document.activeElement)) button.focus();
     show(false);
-    button.focus();
-    event.stopPropagation();
   });
   return boxes;
 }
@@ -81,4 +83,9 @@ function showState({ player, stage }: Page, boxes: HTMLInputElement[]): void {
 function showTime(time: number, duration: number): void {
   setText(byId('clock-time'), clock(time));
   setText(byId('clock-total'), ` / ${clock(duration, 0)}`);
+  const scrubber = byId<HTMLInputElement>('scrubber');
+  if (!document.fullscreenElement) return;
+  scrubber.max = String(duration);
+  scrubber.value = String(time);
+  scrubber.setAttribute('aria-valuetext', spokenTime(time));
 }

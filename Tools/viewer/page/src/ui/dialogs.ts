@@ -11,17 +11,19 @@ const keys: [string, string][] = [
   ['[ ]', 'Previous or next marker: click, window, slide'],
   ['Home End', 'To the start or the end'],
   ['+ − 0', 'Zoom the lanes in or out, show all'],
+  ['< >', 'Move the lanes back or on'],
   ['/', 'Filter the entries'],
   ['n N', 'Next or previous match'],
+  ['Ctrl C', 'Copy the selected entries as CSV; Esc selects none'],
   ['k', 'Show or mask the keys that were typed'],
-  ['1 – 7', 'Switch a layer: cursor, clicks, keystrokes, trail, window, hover, heat map'],
+  ['1 – 7', 'Switch a layer: cursor, clicks, keys, trail, window, hover, heat map'],
   ['m', 'Sound on or off'],
   ['f', 'Full screen'],
   ['?', 'This help'],
 ];
 
 const gestures: [string, string][] = [
-  ['Wheel', 'Zoom the lanes at the pointer; with Shift move them'],
+  ['Wheel', 'Scroll; with Ctrl zoom the lanes at the pointer, with Shift move them'],
   ['Drag', 'Move the lanes, or the playhead where all is in sight'],
   ['Click', 'Go there, in a lane or in the table'],
   ['Link', 'Add #t=12.5 to the address to open at a time'],

@@ -20,6 +20,8 @@ export function setUpKeys(page: Page): void {
     '=': () => page.zoom(0.5),
     '-': () => page.zoom(2),
     '0': () => page.zoom(0),
+    '<': () => page.pan(-0.25),
+    '>': () => page.pan(0.25),
     '/': () => page.findEntries(),
     n: () => page.stepMatch(1),
     N: () => page.stepMatch(-1),
@@ -29,6 +31,7 @@ export function setUpKeys(page: Page): void {
     '?': showHelp,
   };
   for (const { id, key } of layers) actions[key] = () => page.switchLayer(id);
+  watchPointer();
   document.addEventListener('keydown', (event) => {
     const isTaken = event.ctrlKey || event.metaKey || event.altKey || event.defaultPrevented;
     const action = actions[event.key];
@@ -38,10 +41,26 @@ export function setUpKeys(page: Page): void {
   });
 }
 
+/// The button that was clicked last. It keeps the focus, but its reader has the hand on the mouse.
+let clicked: EventTarget | null = null;
+
+function watchPointer(): void {
+  document.addEventListener('pointerdown', ({ target }) => {
+    clicked = (target as Element).closest('button, summary, input');
+  });
+  document.addEventListener('focusin', ({ target }) => {
+    if (target !== clicked) clicked = null;
+  });
+  document.addEventListener('keyup', (event) => {
+    if (event.key === ' ' && clicked !== null && event.target === clicked) event.preventDefault(); // is no click
+  });
+}
+
 /// Whether the element that has the keys does something with this one itself.
 function usesKey({ target, key }: KeyboardEvent): boolean {
   const element = target as Element;
   if (element.closest('dialog[open]')) return true;
+  if (element.matches('input[type="range"]')) return /^(Arrow|Home|End|Page)/.test(key);
   if (element.matches('input:not([type="checkbox"]), textarea, select')) return true;
-  return key === ' ' && element.matches('button, input, summary');
+  return key === ' ' && element !== clicked && element.matches('button, input, summary');
 }

@@ -19,6 +19,8 @@ export interface Page {
   stepMatch(direction: 1 | -1): void;
   /// 0 shows all.
   zoom(factor: number): void;
+  /// Moves the lanes by a part of what is in sight.
+  pan(part: number): void;
   switchLayer(id: string): void;
   switchKeys(): void;
   findEntries(): void;

@@ -13,6 +13,9 @@ export interface Palette {
   third: string;
   idle: string;
   bands: string[];
+  bandEdges: string[];
+  /// Tells what it outlines from the page.
+  edge: string;
   bandText: string;
   font: string;
 }
@@ -36,6 +39,8 @@ export function palette(): Palette {
     third: colour('third'),
     idle: colour('idle'),
     bands: [1, 2, 3, 4, 5, 6].map((number) => colour(`band-${number}`)),
+    bandEdges: [1, 2, 3, 4, 5, 6].map((number) => colour(`band-edge-${number}`)),
+    edge: colour('edge'),
     bandText: colour('band-text'),
     font: colour('font'),
   });

@@ -11,18 +11,24 @@ function setUpSplitter(
   id: string,
   property: string,
   isVertical: boolean,
-  sizeOf: () => number,
+  pane: Element,
   { least, most }: Limits,
 ): void {
   const splitter = byId(id);
+  const sizeOf = () => pane.getBoundingClientRect()[isVertical ? 'width' : 'height'];
   const set = (size: number) => {
     const value = Math.round(Math.max(least, Math.min(size, most())));
     document.documentElement.style.setProperty(property, `${value}px`);
-    splitter.setAttribute('aria-valuenow', String(value));
+    tell();
   };
-  splitter.setAttribute('aria-valuemin', String(least));
-  splitter.setAttribute('aria-valuemax', '4000');
-  splitter.setAttribute('aria-valuenow', String(least));
+  const tell = () => {
+    splitter.setAttribute('aria-valuemin', String(least));
+    splitter.setAttribute('aria-valuemax', String(Math.round(most())));
+    splitter.setAttribute('aria-valuenow', String(Math.round(sizeOf())));
+    splitter.setAttribute('aria-valuetext', `${Math.round(sizeOf())} pixels`);
+  };
+  new ResizeObserver(tell).observe(splitter.parentElement!);
+  new ResizeObserver(tell).observe(pane);
   let from = 0;
   let size = 0;
   const place = (event: PointerEvent) => (isVertical ? event.clientX : event.clientY);
@@ -44,8 +50,8 @@ function setUpSplitter(
 }
 
 export function setUpSplitters(): void {
-  const side = () => document.querySelector('.side')!.getBoundingClientRect().width;
-  const lanes = () => byId('timeline').getBoundingClientRect().height;
+  const side = document.querySelector('.side')!;
+  const lanes = byId('timeline');
   setUpSplitter('side-splitter', '--side-width', true, side, { least: 240, most: () => window.innerWidth * 0.6 });
   setUpSplitter('lanes-splitter', '--lanes-height', false, lanes, {
     least: 120,

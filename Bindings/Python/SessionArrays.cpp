@@ -1,0 +1,100 @@
+#include "Bindings/Python/SessionArrays.h"
+
+#include "Bindings/Tables/SessionTables.h"
+
+#include <pybind11/numpy.h>
+#include <pybind11/stl.h>
+#include <pybind11/stl/filesystem.h>
+
+#include <cstddef>
+#include <string>
+#include <unordered_map>
+#include <utility>
+#include <variant>
+#include <vector>
+
+namespace ZULMetaData::Python {
+
+namespace {
+
+using namespace Bindings;
+
+template <class Number>
+py::object columnOf(const std::vector<Number>& numbers) {
+    return py::array_t<Number>(static_cast<py::ssize_t>(numbers.size()), numbers.data());
+}
+
+py::object columnOf(const std::vector<Text>& texts) {
+    py::list column;
+    for (const Text& text : texts)
+        column.append(text ? py::object(pythonText(*text)) : py::none());
+    return column;
+}
+
+/// Rows that share bytes share one object.
+py::object columnOf(const std::vector<Blob>& blobs) {
+    std::unordered_map<const void*, py::bytes> known;
+    py::list column;
+    for (const Blob& blob : blobs) {
+        if (!blob) {
+            column.append(py::none());
+            continue;
+        }
+        auto [found, isNew] = known.try_emplace(blob.get());
+        if (isNew)
+            found->second = py::bytes(reinterpret_cast<const char*>(blob->data()), blob->size());
+        column.append(found->second);
+    }
+    return column;
+}
+
+/// Returns the name and the values of each column, the times first.
+py::list columnsOf(const Table& table) {
+    py::list columns;
+    columns.append(py::make_tuple("time", columnOf(table.times)));
+    for (const TableColumn& column : table.columns)
+        columns.append(std::visit([&](const auto& values) { return py::make_tuple(column.name, columnOf(values)); },
+                                  column.values));
+    return columns;
+}
+
+/// Computes a table while other threads of Python run.
+template <class Compute>
+py::list computed(Compute compute) {
+    Table table;
+    {
+        const py::gil_scoped_release others;
+        table = compute();
+    }
+    return columnsOf(table);
+}
+
+py::list statesAt(const Recording& recording,
+                  const py::array_t<double, py::array::c_style | py::array::forcecast>& times, bool interpolates) {
+    const std::span<const double> asked(times.data(), static_cast<std::size_t>(times.size()));
+    const Interpolation interpolation = interpolates ? Interpolation::Linear : Interpolation::Held;
+    return computed([&] { return statesTable(recording, asked, interpolation); });
+}
+
+} // namespace
+
+void addSession(py::module_& module) {
+    py::class_<Recording>(module, "Session")
+        .def(py::init<const FileLocation&>(), py::arg("path"), py::call_guard<py::gil_scoped_release>())
+        .def("states", statesAt, py::arg("times"), py::arg("interpolates"))
+        .def(
+            "insight",
+            [](const Recording& recording, const std::string& name, const InsightParameters& parameters) {
+                return computed([&] { return insightTable(recording, name, parameters); });
+            },
+            py::arg("name"), py::arg("parameters"))
+        .def(
+            "retimed",
+            [](const Recording& recording, const std::string& edits) {
+                return computed([&] { return retimedTable(recording, EditList::read(edits, "edits")); });
+            },
+            py::arg("edits"));
+    module.attr("insight_names") = py::tuple(py::cast(insightNames()));
+}
+
+} // namespace ZULMetaData::Python

@@ -1,0 +1,128 @@
+"""What holds at a time, what follows from a recording, and retiming: the same numbers as in C++."""
+
+import json
+import os
+import subprocess
+import threading
+
+import numpy as np
+import pytest
+import zulmetadata
+
+EDITS = {
+    "schema": "zulm.edits",
+    "schema_version": 1,
+    "pieces": [{"start": "1", "end": "19/3", "speed": "3/2"}, {"at": "7", "duration": "1"}],
+}
+needs_programs = pytest.mark.skipif("ZULM_SESSION_NUMBERS" not in os.environ, reason="the tool is not built")
+
+
+def plain(value):
+    if isinstance(value, bytes):
+        return list(value)
+    if isinstance(value, np.generic):
+        value = value.item()
+    return None if isinstance(value, float) and np.isnan(value) else value
+
+
+def plain_table(records):
+    return {name: [plain(value) for value in records[name]] for name in records.dtype.names}
+
+
+@pytest.fixture(scope="module")
+def session(tmp_path_factory):
+    folder = tmp_path_factory.mktemp("session")
+    subprocess.run([os.environ["ZULM_PATH"], "demo", folder], check=True, stdout=subprocess.DEVNULL)
+    return zulmetadata.Recording(folder / "Recording.mp4")
+
+
+@pytest.fixture(scope="module")
+def expected(session):
+    program = [os.environ["ZULM_SESSION_NUMBERS"], session.path, json.dumps(EDITS)]
+    return json.loads(subprocess.run(program, check=True, capture_output=True).stdout)
+
+
+@needs_programs
+def test_knows_what_holds_at_any_time(session, expected):
+    assert plain_table(session.at(expected["times"])) == expected["states"]
+    assert plain_table(session.at(expected["times"], interpolate="none")) == expected["held"]
+
+
+@needs_programs
+def test_knows_what_follows_from_the_recording(session, expected):
+    for name, table in expected["insights"].items():
+        assert plain_table(session.insights(name)) == table, name
+    assert expected["insights"]["clicks"]["time"]
+    assert plain_table(session.insights("idle", least=3)) == expected["least_3"]
+
+
+@needs_programs
+def test_retimes_every_stream(session, expected):
+    records = session.retime(EDITS)
+    names = records.dtype.names
+    assert plain_table(records) == {name: expected["retimed"][name] for name in names}
+    assert session.retime(json.dumps(EDITS)).tolist() == records.tolist()
+
+
+@needs_programs
+def test_retimed_streams_can_be_attached(session, tmp_path):
+    movie = tmp_path / "Edited.mp4"
+    movie.write_bytes(b"\0\0\0\x10ftypmp42\0\0\0\0")
+    files = []
+    for record in session.retime(EDITS):
+        files.append(tmp_path / f"{record['kind']}.dat")
+        files[-1].write_bytes(record["bytes"])
+    zulmetadata.attach(movie, files)
+    assert list(zulmetadata.Recording(movie)) == list(session)
+
+
+@needs_programs
+def test_threads_share_a_recording(session, expected):
+    failures = []
+
+    def ask():
+        if plain_table(session.at(expected["times"])) != expected["states"]:
+            failures.append("other states")
+
+    threads = [threading.Thread(target=ask) for _ in range(4)]
+    for thread in threads:
+        thread.start()
+    for thread in threads:
+        thread.join()
+    assert not failures
+
+
+def test_a_track_is_in_the_order_of_its_times(tmp_path):
+    file = tmp_path / "a.dat"
+    zulmetadata.write_stream(file, "cursorLocation", [(2, 5, 6), (1, 3, 4), (1, 7, 8)])
+    with zulmetadata.Recording(file) as recording:
+        assert recording.track("cursorLocation").tolist() == [(1, 3, 4), (1, 7, 8), (2, 5, 6)]
+        assert recording.at(1.5)["x"].tolist() == [6]
+        assert recording.at(1.5, interpolate="none")["x"].tolist() == [7]
+        assert np.isnan(recording.at([0.5])["x"]).all()
+        assert recording.at([]).size == 0
+
+
+def test_what_cannot_be_asked_is_refused(tmp_path):
+    file = tmp_path / "a.dat"
+    zulmetadata.write_stream(file, "cursorLocation", [(2, 5, 6)])
+    recording = zulmetadata.Recording(file)
+    with pytest.raises(ValueError, match="there are no insights moods"):
+        recording.insights("moods")
+    with pytest.raises(ValueError, match="idle has no parameter most"):
+        recording.insights("idle", most=3)
+    with pytest.raises(ValueError, match="interpolate is"):
+        recording.at([0], interpolate="cubic")
+    with pytest.raises(ValueError):
+        recording.retime("{}")
+    recording.close()
+    with pytest.raises(ValueError, match="is closed"):
+        recording.at([0])
+
+
+def test_records_become_a_data_frame(tmp_path):
+    pytest.importorskip("pandas")
+    file = tmp_path / "a.dat"
+    zulmetadata.write_stream(file, "cursorLocation", [(1, 3, 4), (2, 5, 6)])
+    frame = zulmetadata.to_pandas(zulmetadata.Recording(file)["cursorLocation"])
+    assert frame.index.tolist() == [1, 2] and frame["x"].tolist() == [3, 5]

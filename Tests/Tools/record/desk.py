@@ -1,0 +1,169 @@
+"""A desk to record: an X server of its own, a window manager, and the window of ShownWindow.cpp."""
+
+import contextlib
+import os
+import pathlib
+import shutil
+import signal
+import subprocess
+import tempfile
+import time
+
+PROGRAMS = {"recorder": os.environ.get("ZULM_RECORD", ""), "window": os.environ.get("SHOWN_WINDOW", ""),
+            "zulm": os.environ.get("ZULM", "")}
+
+
+def end(process, number=signal.SIGTERM):
+    if process.poll() is None:
+        process.send_signal(number)
+        try:
+            process.wait(10)
+        except subprocess.TimeoutExpired:
+            process.kill()
+            process.wait()
+
+
+class Desk:
+    """What runs on one X display. Everything ends with it."""
+
+    def __init__(self, size="1280x720x24", manager="openbox", layout=None):
+        self.folder = pathlib.Path(tempfile.mkdtemp(prefix="zulm-desk-"))
+        self.processes = []
+        read, write = os.pipe()
+        self.environment = {name: value for name, value in os.environ.items()
+                            if name not in ("DBUS_SESSION_BUS_ADDRESS", "AT_SPI_BUS_ADDRESS", "WAYLAND_DISPLAY")}
+        self.environment.update(HOME=str(self.folder), XDG_RUNTIME_DIR=str(self.folder), LC_ALL="C.UTF-8")
+        self.start(["Xvfb", "-displayfd", str(write), "-screen", "0", size, "-nolisten", "tcp", "-noreset"], pass_fds=[write])
+        os.close(write)
+        with os.fdopen(read) as numbers:
+            self.display = ":" + numbers.readline().strip()
+        self.environment["DISPLAY"] = self.display
+        if layout:
+            self.run("setxkbmap", *layout)
+        if manager:
+            self.start([manager])
+            self.wait_for(lambda: "window id" in self.run("xprop", "-root", "_NET_SUPPORTING_WM_CHECK"))
+
+    def __enter__(self):
+        return self
+
+    def __exit__(self, *_):
+        for process in reversed(self.processes):
+            end(process)
+        shutil.rmtree(self.folder, ignore_errors=True)
+
+    def start(self, command, **options):
+        environment = options.pop("env", None)
+        options.setdefault("stdout", subprocess.DEVNULL)
+        options.setdefault("stderr", subprocess.DEVNULL)
+        process = subprocess.Popen(command, env=environment or self.environment, cwd=self.folder, **options)
+        self.processes.append(process)
+        return process
+
+    def run(self, *command, **options):
+        options.setdefault("timeout", 60)
+        return subprocess.run(command, env=self.environment, cwd=self.folder, stdout=subprocess.PIPE, text=True,
+                              stderr=subprocess.STDOUT, check=False, **options).stdout
+
+    def xdotool(self, *words):
+        return self.run("xdotool", *[str(word) for word in words])
+
+    @staticmethod
+    def wait_for(holds, seconds=60):
+        until = time.monotonic() + seconds
+        while not holds():
+            if time.monotonic() > until:
+                raise TimeoutError("what was waited for did not happen")
+            time.sleep(0.02)
+
+    def show(self, *geometry, managed=True):
+        window = Window(self, geometry or (200, 100, 800, 500), managed)
+        return window
+
+    def record(self, *options, name="out.mp4", wait=True):
+        return Recording(self, self.folder / name, options, wait)
+
+
+class Window:
+    def __init__(self, desk, geometry, managed):
+        self.desk = desk
+        self.log = desk.folder / f"window-{len(desk.processes)}.log"
+        with open(self.log, "w", encoding="utf-8") as output:
+            self.process = desk.start([PROGRAMS["window"], *[str(number) for number in geometry],
+                                       *([] if managed else ["unmanaged"])], stdin=subprocess.PIPE, stdout=output,
+                                      text=True)
+        desk.wait_for(lambda: self.lines("window"))
+        self.id = int(self.lines("window")[0][0])
+        if managed:
+            desk.wait_for(self.is_active)
+        time.sleep(0.2)
+
+    def is_active(self):
+        """Asks for it: a manager that has just started leaves the focus where it is."""
+        if f"{self.id:x}" in self.desk.run("xprop", "-root", "_NET_ACTIVE_WINDOW"):
+            return True
+        self.desk.xdotool("windowactivate", self.id)
+        return False
+
+    def lines(self, kind):
+        """The words after `kind` of the lines that the window has printed."""
+        words = [line.split() for line in self.log.read_text(encoding="utf-8").splitlines()]
+        return [line[1:] for line in words if line and line[0] == kind]
+
+    def tell(self, line):
+        self.process.stdin.write(line + "\n")
+        self.process.stdin.flush()
+
+
+class Recording:
+    def __init__(self, desk, output, options, wait):
+        self.desk = desk
+        self.output = output
+        self.folder = output.with_name(output.name + ".recording")
+        self.log = desk.folder / f"recorder-{len(desk.processes)}.log"
+        self.json = self.log.with_suffix(".json")
+        with open(self.log, "w", encoding="utf-8") as errors, open(self.json, "w", encoding="utf-8") as document:
+            self.process = desk.start([PROGRAMS["recorder"], "-o", str(output), "--json", *options], stdout=document,
+                                      stderr=errors)
+        if wait:
+            desk.wait_for(lambda: f"recording {output}" in self.errors() or self.process.poll() is not None)
+
+    def errors(self):
+        return self.log.read_text(encoding="utf-8")
+
+    def stop(self, number=signal.SIGTERM):
+        """Ends the recording, and returns how the recorder ended. What was done just before is part of it."""
+        time.sleep(0.4)
+        self.process.send_signal(number)
+        return self.process.wait(60)
+
+    def control(self, word):
+        return self.desk.run(PROGRAMS["recorder"], word)
+
+
+def probe(path, *show):
+    command = ["ffprobe", "-v", "error", "-of", "csv=p=0", *show, str(path)]
+    return subprocess.run(command, capture_output=True, text=True, check=True, timeout=60).stdout.splitlines()
+
+
+def frame_times(path):
+    return [float(line.split(",")[0]) for line in
+            probe(path, "-select_streams", "v", "-show_entries", "packet=pts_time") if line]
+
+
+def pixels(path, area, size=None):
+    """The pixels of an area of each frame, red, green and blue, perhaps shrunk to `size`."""
+    x, y, width, height = area
+    columns, rows = size or (width, height)
+    filters = f"crop={width}:{height}:{x}:{y}" + (f",scale={columns}:{rows}:flags=area" if size else "")
+    command = ["ffmpeg", "-v", "error", "-i", str(path), "-vf", filters, "-fps_mode", "passthrough", "-f", "rawvideo",
+               "-pix_fmt", "rgb24", "-"]
+    data = subprocess.run(command, capture_output=True, check=True, timeout=300).stdout
+    length = columns * rows * 3
+    return [data[start:start + length] for start in range(0, len(data), length)]
+
+
+@contextlib.contextmanager
+def desk(**options):
+    with Desk(**options) as opened:
+        yield opened

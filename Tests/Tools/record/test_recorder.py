@@ -1,0 +1,519 @@
+"""What the recorder promises, seen from outside: an X server without a screen, a person made of xdotool, and a window
+that shows what happens to it. Streams are read by streams.py, pictures by ffmpeg."""
+
+import json
+import os
+import pathlib
+import shutil
+import signal
+import stat
+import statistics
+import struct
+import subprocess
+import sys
+import tempfile
+import time
+import unittest
+
+sys.path.insert(0, os.path.dirname(__file__))
+from desk import PROGRAMS, Desk, end, frame_times, pixels, probe  # noqa: E402
+from streams import atoms_of, streams_of_folder, streams_of_movie  # noqa: E402
+
+IS_VIRTUAL = 0x40000000
+SHIFT, CONTROL, ALT, SUPER, CAPS = 0x20000, 0x40000, 0x80000, 0x80000000, 0x10000
+ALL_KEYS = ("--keys", "all", "--without-accessibility")
+
+
+def colour_index(pixel):
+    """Which of the eight colours of the window's strip this is."""
+    red, green, blue = (channel > 170 for channel in pixel)
+    if all(90 < channel < 170 for channel in pixel):
+        return 7
+    return red << 2 | green << 1 | blue
+
+
+class Test(unittest.TestCase):
+    def recorded(self, recording, code=0):
+        """Ends a recording that ends well, and returns its streams."""
+        self.assertEqual(recording.stop(), code, recording.errors())
+        self.assertFalse(recording.folder.exists())
+        return streams_of_movie(recording.output)
+
+    def assert_near(self, value, expected, tolerance):
+        self.assertLessEqual(abs(value - expected), tolerance, f"{value} is not {expected}")
+
+
+class Files(Test):
+    def test_duration_makes_an_ordinary_movie_with_every_tick(self):
+        with Desk() as desk:
+            desk.show()
+            recording = desk.record("--duration", "2")
+            self.assertEqual(os.stat(recording.folder).st_mode & 0o777, 0o700)
+            self.assertTrue((recording.folder / "movie.mp4").exists())
+            self.assertEqual(recording.process.wait(30), 0)
+            document = json.loads(recording.json.read_text())
+            times = frame_times(recording.output)
+            schema = pathlib.Path(__file__).parents[3] / "Docs/schemas/zulm.record.schema.json"
+            self.assertEqual(list(document), json.loads(schema.read_text())["required"])
+            self.assertEqual(document["schema"], "zulm.record")
+            self.assertEqual(document["stopped_by"], "duration")
+            self.assertEqual(document["movie"], str(recording.output))
+            self.assertIsNone(document["folder"])
+            self.assertEqual(document["frames"], len(times))
+            self.assertEqual(document["frames"] + document["dropped"], 60)
+            self.assertEqual(times[0], 0)
+            self.assertEqual(times, sorted(set(times)))
+            self.assert_near(document["duration"], 2, 0.001)
+            self.assert_near(float(probe(recording.output, "-show_entries", "format=duration")[0]), 2, 0.001)
+            self.assertEqual(probe(recording.output, "-show_entries", "stream=time_base")[0], "1/90000")
+            data = recording.output.read_bytes()
+            names = [name for name, _, _ in atoms_of(data)]
+            self.assertEqual(names.count("moov"), 1)
+            self.assertNotIn("moof", names)
+            self.assertEqual(names[-2:], ["ZULM", "ZULR"])
+            for name, start, _ in atoms_of(data):
+                if name == "moov":
+                    scale = struct.unpack_from(">I", data, start + 8 + 12)[0]
+                    self.assertGreaterEqual(scale, 90000)
+            self.assertFalse(recording.folder.exists())
+            self.assertEqual(os.listdir(desk.folder).count("out.mp4"), 1)
+            if PROGRAMS["zulm"]:
+                self.assertEqual(subprocess.run([PROGRAMS["zulm"], "verify", recording.output], check=False,
+                                                capture_output=True).returncode, 0)
+
+    def test_what_holds_at_the_start_is_written_at_0(self):
+        with Desk() as desk:
+            window = desk.show()
+            desk.xdotool("mousemove", 640, 400)
+            streams = self.recorded(desk.record("--region", "11,13,801x601"))
+            self.assertEqual(streams["recordingRegion"][0].value, (11, 13, 800, 600))
+            self.assertEqual(streams["cursorLocation"][0].value, (640, 400))
+            self.assertEqual(streams["topmostWindowTitle"][0].value, "Shown Window")
+            self.assertEqual(streams["topmostAppName"][0].value, "ShownWindow")
+            self.assertEqual(streams["cursorOpacity"][0].value, 1)
+            self.assertEqual(streams["recordingScaleFactor"][0].value, 1)
+            self.assertEqual(streams["cursorAction"][0].value, 256)
+            for kind in ("cursorLocation", "cursorImage", "cursorAction", "cursorOpacity", "recordingRegion",
+                         "recordingScaleFactor", "systemData", "topmostWindow", "topmostWindowTitle", "topmostAppName",
+                         "hoverRect"):
+                self.assertEqual(struct.unpack_from("<d", streams[kind][0].value)[0]
+                                 if kind == "cursorImage" else streams[kind][0].time, 0, kind)
+            outer = streams["topmostWindow"][0].value
+            self.assertTrue(outer[2] > 800 and outer[3] > 500, f"{outer} has no frame of window {window.id}")
+
+    def test_what_exists_is_never_replaced(self):
+        with Desk(manager=None) as desk:
+            output = desk.folder / "out.mp4"
+            output.write_text("mine")
+            recording = desk.record(wait=False)
+            self.assertEqual(recording.process.wait(20), 2)
+            self.assertEqual(output.read_text(), "mine")
+            self.assertFalse(recording.folder.exists())
+            output.unlink()
+            recording.folder.mkdir()
+            self.assertEqual(desk.record(wait=False).process.wait(20), 2)
+            self.assertEqual(list(recording.folder.iterdir()), [])
+
+    def test_refusals_create_nothing(self):
+        with Desk(manager=None) as desk:
+            before = set(os.listdir(desk.folder))
+            for options in (["--fps", "0"], ["--fps", "61"], ["--region", "0,0,9999x10"], ["--region", "x"],
+                            ["--keys", "some"], ["--display", ":987"], ["--monitor", "none"], ["--window", "none"],
+                            ["--codec", "none"], ["--deny-title", "("], ["--stop-on-close"], ["--nonsense"],
+                            ["--duration", "-1"], ["--keys", "all"]):
+                result = subprocess.run([PROGRAMS["recorder"], "-o", desk.folder / "no.mp4", *options], check=False,
+                                        env=desk.environment, capture_output=True, timeout=30)
+                self.assertEqual(result.returncode, 2, (options, result.stderr))
+                self.assertNotEqual(result.stderr, b"", options)
+            self.assertEqual(set(os.listdir(desk.folder)), before)
+
+    def test_a_second_signal_ends_at_once_and_keeps_the_folder(self):
+        with Desk(manager=None) as desk:
+            recording = desk.record("--fps", "60")
+            time.sleep(1)
+            recording.process.send_signal(signal.SIGSTOP)
+            recording.process.send_signal(signal.SIGINT)
+            recording.process.send_signal(signal.SIGTERM)
+            recording.process.send_signal(signal.SIGCONT)
+            code = recording.process.wait(30)
+            if code != 0:  # both may have arrived as one
+                self.assertIn(code, (128 + signal.SIGINT, 128 + signal.SIGTERM))
+                self.assertEqual(recording.errors().splitlines()[-1], str(recording.folder))
+                self.assertTrue(recording.folder.exists())
+
+
+class Picture(Test):
+    def test_picture_and_streams_are_of_one_time(self):
+        """Clicks and keys change the colour of the window. No frame shows one before its entry; how soon one does is
+        measured on a machine at rest, by the reliability checks."""
+        with Desk() as desk:
+            window = desk.show(0, 0, 1280, 700)
+            desk.xdotool("mousemove", 600, 400)
+            recording = desk.record("--fps", "60", *ALL_KEYS, "--quality", "23")
+            for index in range(30):
+                desk.xdotool("key", "a") if index % 2 else desk.xdotool("click", 1)
+                time.sleep(0.03)
+                desk.xdotool("mousemove", 200 + 30 * index, 300 + 5 * index)
+                time.sleep(0.06)
+            streams = self.recorded(recording)
+            times = frame_times(recording.output)
+            top = streams["topmostWindow"][0].value
+            strip = pixels(recording.output, (top[0] + 600, top[1] + 50, 2, 2))
+            events = sorted([entry.time for entry in streams["cursorAction"] if entry.value == 1] +
+                            [entry.time for entry in streams["keyboardAction"]])
+            self.assertEqual(len(events), 30)
+            colours = [colour_index(frame[:3]) for frame in strip]
+            late = []
+            for count, event in enumerate(events, start=1):
+                shown = [time for time, colour in zip(times, colours) if colour == count % 8 and time >= event - 0.05]
+                self.assertTrue(shown, f"event {count} is in no frame")
+                late.append(min(shown) - event)
+            print(f"picture after events: median {1000 * statistics.median(late):.1f} ms, "
+                  f"largest {1000 * max(late):.1f} ms")
+            self.assertGreater(min(late), -0.017)
+            self.assertEqual(len(window.lines("button")) + len(window.lines("key")), 30)
+
+
+class Pointer(Test):
+    def test_positions_are_those_of_the_server(self):
+        with Desk() as desk:
+            desk.show()
+            desk.xdotool("mousemove", 300, 300)
+            recording = desk.record()
+            time.sleep(0.3)
+            path = [(320 + 20 * index, 300 + 7 * index) for index in range(20)]
+            for x, y in path:  # these warp
+                desk.xdotool("mousemove", x, y)
+                time.sleep(0.06)
+            for _ in range(20):  # these are motions
+                desk.xdotool("mousemove_relative", "--", -5, 3)
+                time.sleep(0.03)
+                path.append((path[-1][0] - 5, path[-1][1] + 3))
+            positions = self.recorded(recording)["cursorLocation"]
+            seen = [entry.value for index, entry in enumerate(positions)
+                    if index == 0 or entry.value != positions[index - 1].value]
+            self.assertEqual(seen, [(300, 300), *path])
+            for before, entry in zip(positions, positions[1:]):  # nobody interpolates across a rest
+                if entry.value != before.value:
+                    self.assertLess(entry.time - before.time, 0.034)
+
+    def test_buttons_and_modifiers(self):
+        with Desk() as desk:
+            desk.show()
+            desk.xdotool("mousemove", 600, 400)
+            recording = desk.record()
+            desk.xdotool("click", 1)
+            desk.xdotool("keydown", "shift", "keydown", "ctrl", "click", 3, "keyup", "ctrl", "keyup", "shift")
+            desk.xdotool("keydown", "alt", "click", 2, "keyup", "alt")
+            desk.xdotool("keydown", "super", "mousedown", 1, "keyup", "super", "mouseup", 1)
+            desk.xdotool("click", 8)
+            actions = [entry.value for entry in self.recorded(recording)["cursorAction"]]
+            self.assertEqual(actions, [256, 1, 2, 4 + 16 + 32, 8 + 16 + 32, 16, 32, 1 + 128, 2])
+
+    def test_a_notch_of_the_wheel_is_120(self):
+        with Desk() as desk:
+            desk.show()
+            desk.xdotool("mousemove", 600, 400)
+            recording = desk.record()
+            for button in (4, 4, 5, 6, 7):
+                desk.xdotool("click", button)
+            streams = self.recorded(recording)
+            self.assertEqual([entry.value for entry in streams["scrollAction"]],
+                             [(0, 120), (0, 120), (0, -120), (120, 0), (-120, 0)])
+            self.assertEqual([entry.value for entry in streams["cursorAction"]], [256])
+
+    def test_cursors_are_told_apart_by_their_look(self):
+        with Desk() as desk:
+            window = desk.show()
+            desk.xdotool("mousemove", 600, 400)
+            window.tell("cursor 34")
+            time.sleep(0.2)
+            recording = desk.record()
+            for line in ("cursor 60", "cursor 34", "blank", "cursor 60"):
+                window.tell(line)
+                time.sleep(0.3)
+            streams = self.recorded(recording)
+            entries = [entry.value for entry in streams["cursorImage"]]
+            numbers = [struct.unpack_from("<Q", entry, 8)[0] for entry in entries]
+            sizes = [struct.unpack_from("<I", entry, 20)[0] for entry in entries]
+            self.assertEqual(numbers, [numbers[0], numbers[1], numbers[0], numbers[3], numbers[1]])
+            self.assertEqual(len(set(numbers)), 3)
+            self.assertEqual([size > 0 for size in sizes], [True, True, False, True, False])
+            self.assertEqual(struct.unpack_from("<2i", entries[3], 24), (3, 4))
+            self.assertEqual([entry.value for entry in streams["cursorOpacity"]], [1, 0, 1])
+
+
+class Keys(Test):
+    def keys(self, desk, options, press, window=True):
+        if window:
+            desk.show()
+        recording = desk.record(*options)
+        press()
+        return [entry.value for entry in self.recorded(recording)["keyboardAction"]]
+
+    def test_all_keys_are_what_they_type(self):
+        with Desk() as desk:
+            def press():
+                desk.xdotool("key", "a", "A", "1", "exclam", "space", "Return", "F8", "shift+F8", "Left")
+                desk.xdotool("key", "ctrl+a", "ctrl+shift+a", "ctrl+1", "ctrl+minus", "alt+Tab", "super+x")
+                desk.xdotool("key", "Caps_Lock", "b", "1", "Caps_Lock")
+                desk.xdotool("key", "shift", "ctrl")
+            self.assertEqual(self.keys(desk, ALL_KEYS, press), [
+                (ord("a"), 0), (ord("A"), 0), (ord("1"), 0), (ord("!"), 0), (32, 0), (13, IS_VIRTUAL),
+                (119, IS_VIRTUAL), (119, IS_VIRTUAL | SHIFT), (37, IS_VIRTUAL),
+                (ord("A"), IS_VIRTUAL | CONTROL), (ord("A"), IS_VIRTUAL | CONTROL | SHIFT),
+                (ord("1"), IS_VIRTUAL | CONTROL), (ord("-"), CONTROL), (9, IS_VIRTUAL | ALT),
+                (ord("X"), IS_VIRTUAL | SUPER), (ord("B"), 0), (ord("1"), CAPS)])
+
+    def test_dead_keys_and_groups(self):
+        with Desk(layout=["-layout", "de"]) as desk:
+            desk.show()
+            recording = desk.record(*ALL_KEYS)
+            codes = {"dead_acute": 21, "e": 26, "q": 24, "ssharp": 20}
+            desk.xdotool("key", codes["dead_acute"])
+            desk.xdotool("key", codes["e"])
+            desk.xdotool("key", "ISO_Level3_Shift+" + str(codes["q"]))
+            desk.xdotool("key", codes["ssharp"])
+            desk.run("setxkbmap", "ru")
+            time.sleep(0.3)
+            desk.xdotool("key", codes["q"], "ctrl+" + str(codes["q"]))
+            keys = [entry.value for entry in self.recorded(recording)["keyboardAction"]]
+            self.assertEqual(keys, [(ord("é"), 0), (ord("@"), 0), (ord("ß"), 0), (ord("й"), 0),
+                                    (ord("й"), CONTROL)])
+
+    def test_texts_of_two_layouts(self):
+        texts = {"us": "The quick brown fox jumps over 13 lazy dogs, {twice}!", "de": "Zwölf Boxkämpfer jagen, äöüß?"}
+        for layout, text in texts.items():
+            with Desk(layout=["-layout", layout]) as desk:
+                typed = self.keys(desk, ALL_KEYS, lambda: desk.xdotool("type", "--delay", "20", text))
+                self.assertEqual("".join(chr(code) for code, _ in typed), text)
+
+    def test_shortcuts_hold_no_text(self):
+        with Desk() as desk:
+            def press():
+                desk.xdotool("type", "secret 123")
+                desk.xdotool("key", "KP_5", "ctrl+c", "F5", "BackSpace", "shift+a", "super+1")
+            self.assertEqual(self.keys(desk, ["--without-accessibility"], press),
+                             [(ord("C"), IS_VIRTUAL | CONTROL), (116, IS_VIRTUAL), (8, IS_VIRTUAL),
+                              (ord("1"), IS_VIRTUAL | SUPER)])
+
+    def test_none_holds_nothing(self):
+        with Desk() as desk:
+            desk.show()
+            recording = desk.record("--keys", "none")
+            desk.xdotool("key", "ctrl+c", "F5", "a")
+            self.assertNotIn("keyboardAction", self.recorded(recording))
+
+    def test_repeats_are_recorded(self):
+        with Desk() as desk:
+            desk.run("xset", "r", "rate", "200", "25")
+            def press():
+                desk.xdotool("keydown", "Down")
+                time.sleep(0.8)
+                desk.xdotool("keyup", "Down")
+            keys = self.keys(desk, ["--without-accessibility"], press)
+            self.assertGreater(len(keys), 5)
+            self.assertEqual(set(keys), {(40, IS_VIRTUAL)})
+
+
+class Windows(Test):
+    def test_titles_and_places_follow_the_window(self):
+        with Desk() as desk:
+            window = desk.show(200, 100, 400, 300)
+            recording = desk.record()
+            for line in ("title Zweites Fenster ü", "move 300 200", "resize 500 350", "class Other"):
+                window.tell(line)
+                time.sleep(0.3)
+            end(window.process)
+            streams = self.recorded(recording)
+            self.assertEqual([entry.value for entry in streams["topmostWindowTitle"]],
+                             ["Shown Window", "Zweites Fenster ü", ""])
+            self.assertEqual([entry.value for entry in streams["topmostAppName"]], ["ShownWindow", "Other", ""])
+            areas = [entry.value for entry in streams["topmostWindow"]]
+            self.assertEqual(areas[-1], (0, 0, 0, 0))
+            self.assertTrue(any(area[2] >= 500 and area[3] >= 350 for area in areas), areas)
+
+    def test_without_a_manager_the_focus_counts(self):
+        with Desk(manager=None) as desk:
+            window = desk.show(200, 100, 400, 300, managed=False)
+            desk.xdotool("mousemove", 300, 200)
+            streams = self.recorded(desk.record())
+            self.assertEqual(streams["topmostWindowTitle"][-1].value, "Shown Window")
+            self.assertEqual(streams["topmostWindow"][-1].value, (200, 100, 400, 300))
+            self.assertEqual(streams["hoverRect"][-1].value, (200, 100, 400, 300), window.id)
+
+    def test_denied_windows_leave_no_title_and_no_key(self):
+        with Desk() as desk:
+            window = desk.show()
+            recording = desk.record(*ALL_KEYS, "--deny-title", "secret")
+            desk.xdotool("key", "a")
+            time.sleep(0.3)
+            window.tell("title Top Secret")
+            time.sleep(0.3)
+            desk.xdotool("key", "b")
+            time.sleep(0.3)
+            window.tell("title Open")
+            time.sleep(0.3)
+            desk.xdotool("key", "c")
+            streams = self.recorded(recording)
+            self.assertEqual([entry.value for entry in streams["topmostWindowTitle"]], ["Shown Window", "", "Open"])
+            self.assertEqual([chr(entry.value[0]) for entry in streams["keyboardAction"]], ["a", "c"])
+
+
+class Control(Test):
+    def test_a_pause_is_not_in_the_recording(self):
+        with Desk() as desk:
+            window = desk.show()
+            recording = desk.record(*ALL_KEYS)
+            sockets = [path for path in desk.folder.iterdir() if stat.S_ISSOCK(os.stat(path).st_mode)]
+            self.assertEqual([os.stat(path).st_mode & 0o777 for path in sockets], [0o600])
+            desk.xdotool("key", "a")
+            time.sleep(0.5)
+            recording.control("--pause")
+            desk.xdotool("key", "b")
+            window.tell("title Changed")
+            time.sleep(1.5)
+            recording.control("--resume")
+            time.sleep(0.5)
+            desk.xdotool("key", "c")
+            time.sleep(0.5)
+            self.assertEqual(desk.run(PROGRAMS["recorder"], "--stop"), "")
+            self.assertEqual(recording.process.wait(20), 0)
+            document = json.loads(recording.json.read_text())
+            self.assertEqual(document["stopped_by"], "stop")
+            streams = streams_of_movie(recording.output)
+            self.assertEqual([chr(entry.value[0]) for entry in streams["keyboardAction"]], ["a", "c"])
+            titles = streams["topmostWindowTitle"]
+            self.assertEqual([entry.value for entry in titles], ["Shown Window", "Changed"])
+            self.assertLess(document["duration"], 2.6)
+            times = frame_times(recording.output)
+            gaps = [after - before for before, after in zip(times, times[1:])]
+            self.assertLess(max(gaps), 0.5)
+            self.assertEqual([path for path in sockets if path.exists()], [])
+
+    def test_the_click_that_stops_is_not_in_it(self):
+        with Desk() as desk:
+            desk.show()
+            desk.xdotool("mousemove", 600, 400)
+            recording = desk.record("--without-accessibility")
+            desk.xdotool("click", 1)
+            time.sleep(0.5)
+            desk.xdotool("mousedown", 1)
+            desk.run(PROGRAMS["recorder"], "--stop")
+            self.assertEqual(recording.process.wait(20), 0)
+            self.assertEqual([entry.value for entry in streams_of_movie(recording.output)["cursorAction"]], [256, 1, 2])
+
+    def test_the_window_that_closes_ends_it(self):
+        with Desk() as desk:
+            window = desk.show(100, 100, 401, 301)
+            recording = desk.record("--window", "Shown", "--stop-on-close")
+            time.sleep(0.5)
+            window.tell("close")
+            self.assertEqual(recording.process.wait(20), 0, recording.errors())
+            self.assertEqual(json.loads(recording.json.read_text())["stopped_by"], "window")
+
+    def test_nobody_to_control(self):
+        with Desk(manager=None) as desk:
+            self.assertIn("no recorder is running", desk.run(PROGRAMS["recorder"], "--stop"))
+
+
+class Loss(Test):
+    def test_a_killed_recording_is_recovered(self):
+        with Desk() as desk:
+            desk.show()
+            recording = desk.record(*ALL_KEYS)
+            begun = time.monotonic()
+            for index in range(12):
+                desk.xdotool("key", "abcdefghijkl"[index])
+                desk.xdotool("mousemove", 300 + 10 * index, 300)
+                time.sleep(0.2)
+            pressed = time.monotonic() - begun
+            end(recording.process, signal.SIGKILL)
+            killed = time.monotonic() - begun
+            self.assertFalse(recording.output.exists())
+            command = [PROGRAMS["recorder"], "--recover", recording.folder]
+            result = subprocess.run(command, capture_output=True, check=False)
+            self.assertEqual(result.returncode, 0, result.stderr)
+            self.assertTrue(recording.folder.exists())
+            before = recording.output.read_bytes()
+            self.assertEqual(subprocess.run(command, check=False, capture_output=True).returncode, 0)
+            self.assertEqual(recording.output.read_bytes(), before)
+            self.assertGreater(frame_times(recording.output)[-1], 0)  # the reliability checks hold it to a second
+            streams = streams_of_movie(recording.output)
+            typed = "".join(chr(entry.value[0]) for entry in streams["keyboardAction"])
+            self.assertTrue("abcdefghijkl".startswith(typed))
+            self.assertGreaterEqual(len(typed), sum(1 for index in range(12)
+                                                    if index * pressed / 12 < killed - 0.75 - 0.2))
+            self.assertEqual(subprocess.run([*command, "--delete"], check=False, capture_output=True).returncode, 0)
+            self.assertFalse(recording.folder.exists())
+            self.assertEqual(subprocess.run(command, check=False, capture_output=True).returncode, 0)
+
+    def test_a_movie_that_was_cut_is_told(self):
+        with Desk(manager=None) as desk:
+            recording = desk.record()
+            time.sleep(4)
+            end(recording.process, signal.SIGKILL)
+            movie = recording.folder / "movie.mp4"
+            os.truncate(movie, movie.stat().st_size // 2)
+            command = [PROGRAMS["recorder"], "--recover", recording.folder]
+            self.assertEqual(subprocess.run(command, check=False, capture_output=True).returncode, 3)
+            self.assertTrue(recording.output.exists())
+
+    def test_nothing_to_recover(self):
+        with tempfile.TemporaryDirectory() as folder:
+            empty = pathlib.Path(folder) / "a.mp4.recording"
+            empty.mkdir()
+            command = [PROGRAMS["recorder"], "--recover", empty]
+            self.assertEqual(subprocess.run(command, check=False, capture_output=True).returncode, 1)
+            self.assertEqual(os.listdir(folder), ["a.mp4.recording"])
+
+
+class Privacy(Test):
+    """With the accessibility bus, whose address is that of the root window of the desk."""
+
+    def start_bus(self, desk):
+        bus = desk.start(["dbus-daemon", "--session", "--print-address", "--nofork"], stdout=subprocess.PIPE, text=True)
+        desk.environment["DBUS_SESSION_BUS_ADDRESS"] = bus.stdout.readline().strip()
+
+    def test_what_is_not_known_is_left_out(self):
+        """ShownWindow tells the bus nothing, so nobody knows whether it shows a password field."""
+        with Desk() as desk:
+            self.start_bus(desk)
+            desk.show()
+            for options in (["--keys", "all"], ["--keys", "shortcuts"]):
+                recording = desk.record(*options, name=options[1] + ".mp4")
+                desk.xdotool("key", "a", "F5", "ctrl+c")
+                desk.xdotool("mousemove", 600, 400, "click", 1)
+                streams = self.recorded(recording)
+                self.assertNotIn("keyboardAction", streams)
+                self.assertEqual([entry.value for entry in streams["cursorAction"]], [256, 1, 2])
+
+    def test_a_watcher_that_dies_or_hangs_harms_nothing(self):
+        for number in (signal.SIGKILL, signal.SIGSTOP):
+            with Desk() as desk:
+                self.start_bus(desk)
+                desk.show()
+                recording = desk.record("--keys", "all")
+                watchers = desk.run("pgrep", "-P", str(recording.process.pid)).split()
+                self.assertEqual(len(watchers), 1)
+                os.kill(int(watchers[0]), number)
+                for index in range(30):
+                    desk.xdotool("mousemove", 300 + index, 300)
+                    time.sleep(0.1)
+                    desk.xdotool("key", "a")
+                streams = self.recorded(recording)
+                self.assertNotIn("keyboardAction", streams)
+                self.assertEqual(streams["cursorLocation"][-1].value, (329, 300))
+
+
+def missing_programs():
+    missing = [] if PROGRAMS["recorder"] else ["the recorder, whose libraries 'scripts/install.sh record' installs"]
+    return missing + [name for name in ("Xvfb", "openbox", "xdotool", "xprop", "setxkbmap", "ffmpeg", "dbus-daemon")
+                      if not shutil.which(name)]
+
+
+if __name__ == "__main__":
+    if missing_programs():
+        print("skipped, because there is no " + ", no ".join(missing_programs()))
+        sys.exit(77)
+    unittest.main(verbosity=2)

@@ -1,0 +1,60 @@
+// Prints the table of Docs/viewer.md, measured from pictures of the screen: node figures.mjs, with the settings of the
+// tests.
+
+import { test } from 'node:test';
+import { after, differencesOf, look, numberedRecording, settled, watch } from './numbered.mjs';
+import { open, opened, ready } from './support.mjs';
+
+const rates = [
+  ['10', '10'],
+  ['29.97', '30000/1001'],
+  ['30', '30'],
+  ['60', '60'],
+];
+const count = 30;
+
+async function measured(recording, work) {
+  const { page, close } = await open(recording.page, { size: [1280, 800] });
+  await opened(page);
+  await ready(page);
+  await settled(page);
+  const result = await work(page);
+  await close();
+  return result;
+}
+
+/// How many of the steps or seeks show the picture that they ask for, with the cursor of its time.
+async function right(recording, page, ask) {
+  let found = 0;
+  for (let number = 5; number < 5 + count; ++number) {
+    await ask(number);
+    await settled(page);
+    const seen = await look(page);
+    const late = after(seen.time, recording.times[number]);
+    if (seen.number === number && late > -0.01 && late < 0.11) ++found;
+  }
+  return `${found} of ${count}`;
+}
+
+async function row(name, rate) {
+  const recording = numberedRecording(`Figures${name.replace('.', '')}`, { rate, seconds: 8 });
+  const go = (page, time) => page.evaluate((time) => zulmViewer.seek(time), time);
+  const [up, down = 1] = rate.split('/').map(Number);
+  const seeks = await measured(recording, (page) => right(recording, page, (number) => go(page, (number * down) / up)));
+  const steps = await measured(recording, async (page) => {
+    await go(page, recording.times[4]);
+    await settled(page);
+    return right(recording, page, () => page.keyboard.press('.'));
+  });
+  const playing = await measured(recording, async (page) => differencesOf(await watch(page, recording, 6)));
+  return [name, steps, seeks, playing.median, playing.nearlyAll, playing.worst];
+}
+
+test('figures', async () => {
+  const lines = [
+    ['pictures a second', 'right steps', 'right seeks', 'median', '95 %', 'worst'],
+    ['---:', '---:', '---:', '---:', '---:', '---:'],
+  ];
+  for (const [name, rate] of rates) lines.push(await row(name, rate));
+  process.stdout.write(lines.map((cells) => `| ${cells.join(' | ')} |\n`).join(''));
+});

@@ -1,0 +1,71 @@
+#pragma once
+
+// The process that asks the accessibility bus. It may hang or die: then nothing is known of the focus.
+
+#include "Tools/record/FileHandle.h"
+#include "Tools/record/Geometry.h"
+#include "Tools/record/Instant.h"
+#include "Tools/record/PrivacyFilter.h"
+
+#include <sys/types.h>
+
+#include <cstdint>
+#include <functional>
+#include <optional>
+#include <string>
+
+namespace Recorder {
+
+/// What the process tells.
+struct AccessibilityEvents {
+    std::function<void(std::uint32_t process, Focus focus)> focus; ///< of an application has changed
+    std::function<void(Instant asked, Focus focus)> answer;        ///< to a question about the focus
+    std::function<void(const std::optional<Area>& area)> hover;    ///< what the pointer is over, if the bus knows
+    std::function<void()> gone;                                    ///< nothing more comes
+};
+
+class AccessibilityProcess {
+public:
+    /// Starts the process for a display.
+    explicit AccessibilityProcess(const std::string& display);
+    ~AccessibilityProcess();
+    AccessibilityProcess(const AccessibilityProcess&) = delete;
+    AccessibilityProcess& operator=(const AccessibilityProcess&) = delete;
+
+    /// Waits for the process to reach the bus. Returns false if there is none, or if that takes too long.
+    bool waitUntilReady(Instant until);
+
+    int descriptor() const { return output_.get(); }
+    bool isAlive() const { return static_cast<bool>(output_); }
+
+    /// Takes what has arrived.
+    void serve(const AccessibilityEvents& events);
+
+    /// Another window is on top. The answer tells its focus.
+    void windowChanged(std::uint32_t process);
+
+    /// Asks for the focus of the window on top, unless such a question waits for its answer.
+    void ask();
+
+    /// Asks what the pointer hovers over, unless such a question waits for its answer.
+    void askHover(Position pointer);
+
+private:
+    bool readLines(const std::function<void(const std::string&)>& take);
+    void send(const std::string& line);
+    void end();
+
+    pid_t process_ = -1;
+    FileHandle input_;
+    FileHandle output_;
+    std::string pending_;
+    std::uint64_t windows_ = 0; ///< how many windows came to the top
+    std::optional<Instant> asked_;
+    std::uint64_t askedWindow_ = 0;
+    bool isHovering_ = false;
+};
+
+/// The child's side: asks the bus of the display that the environment names, until its input ends.
+int watchAccessibility();
+
+} // namespace Recorder

@@ -1,0 +1,235 @@
+// The side of the child: the only source that knows the accessibility bus.
+
+#include "Tools/record/AccessibilityProcess.h"
+#include "Tools/record/XConnection.h"
+
+#include <atspi/atspi.h>
+#include <glib-unix.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <iostream>
+#include <sstream>
+
+namespace Recorder {
+
+namespace {
+
+constexpr int s_callTimeout = 400;   ///< milliseconds of one call
+constexpr int s_visitedAtMost = 600; ///< objects, in search of the focus
+
+struct ObjectDeleter {
+    void operator()(void* object) const { g_object_unref(object); }
+};
+template <class T>
+using Object = std::unique_ptr<T, ObjectDeleter>;
+
+class Watcher {
+public:
+    /// Returns false if there is no bus.
+    bool reach();
+    void run();
+    void focused(AtspiAccessible* accessible);
+
+private:
+    static gboolean inputArrived(gint descriptor, GIOCondition condition, gpointer self);
+    void obey(const std::string& line);
+    void say(const std::string& line);
+    void answerHover(int x, int y);
+    Object<AtspiAccessible> applicationOf(std::uint32_t process);
+    Object<AtspiAccessible> activeWindowOf(AtspiAccessible* application);
+    Object<AtspiAccessible> focusIn(AtspiAccessible* accessible, int& visits);
+    const char* currentFocus();
+
+    std::string pending_;
+    std::uint32_t process_ = 0;     ///< of the window on top
+    Object<AtspiAccessible> focus_; ///< the last that was told, or was found
+    std::uint32_t focusProcess_ = 0;
+};
+
+bool hasState(AtspiAccessible* accessible, AtspiStateType state) {
+    const Object<AtspiStateSet> states(atspi_accessible_get_state_set(accessible));
+    return states && atspi_state_set_contains(states.get(), state);
+}
+
+std::uint32_t processOf(AtspiAccessible* accessible) {
+    return atspi_accessible_get_process_id(accessible, nullptr);
+}
+
+/// Returns nullptr if the application does not answer.
+const char* kindOf(AtspiAccessible* accessible) {
+    GError* error = nullptr;
+    atspi_accessible_clear_cache(accessible);
+    const AtspiRole role = atspi_accessible_get_role(accessible, &error);
+    if (error) {
+        g_error_free(error);
+        return nullptr;
+    }
+    return role == ATSPI_ROLE_PASSWORD_TEXT ? "password" : "ordinary";
+}
+
+void focusChanged(AtspiEvent* event, void* watcher) {
+    if (event->detail1 != 0 && event->source)
+        static_cast<Watcher*>(watcher)->focused(event->source);
+    g_boxed_free(ATSPI_TYPE_EVENT, event);
+}
+
+/// Whether a bus may be looked for: libraries would start one otherwise.
+bool hasBusAddress() {
+    if (std::getenv("AT_SPI_BUS_ADDRESS") || std::getenv("DBUS_SESSION_BUS_ADDRESS"))
+        return true;
+    if (const char* folder = std::getenv("XDG_RUNTIME_DIR"))
+        if (std::error_code error; std::filesystem::exists(std::filesystem::path(folder) / "bus", error))
+            return true;
+    const XConnection connection("");
+    return connection.text(connection.root(), connection.atom("AT_SPI_BUS")).has_value();
+}
+
+bool Watcher::reach() {
+    if (!hasBusAddress() || atspi_init() > 1)
+        return false;
+    atspi_set_timeout(s_callTimeout, s_callTimeout);
+    AtspiEventListener* listener = atspi_event_listener_new(focusChanged, this, nullptr);
+    GError* error = nullptr;
+    const bool isRegistered = atspi_event_listener_register(listener, "object:state-changed:focused", &error);
+    const Object<AtspiAccessible> desktop(atspi_get_desktop(0));
+    if (!isRegistered || error || !desktop)
+        return false;
+    atspi_accessible_get_child_count(desktop.get(), &error);
+    return error == nullptr;
+}
+
+void Watcher::run() {
+    say("ready");
+    g_unix_fd_add(STDIN_FILENO, static_cast<GIOCondition>(G_IO_IN | G_IO_HUP), inputArrived, this);
+    atspi_event_main();
+}
+
+gboolean Watcher::inputArrived(gint descriptor, GIOCondition, gpointer self) {
+    Watcher& watcher = *static_cast<Watcher*>(self);
+    std::array<char, 1024> bytes{};
+    const ssize_t count = read(descriptor, bytes.data(), bytes.size());
+    if (count <= 0)
+        std::_Exit(0); // the recorder has ended
+    watcher.pending_.append(bytes.data(), static_cast<std::size_t>(count));
+    for (std::size_t end = 0; (end = watcher.pending_.find('\n')) != std::string::npos;) {
+        const std::string line = watcher.pending_.substr(0, end);
+        watcher.pending_.erase(0, end + 1);
+        watcher.obey(line);
+    }
+    return G_SOURCE_CONTINUE;
+}
+
+void Watcher::say(const std::string& line) {
+    std::cout << line << '\n' << std::flush;
+}
+
+void Watcher::obey(const std::string& line) {
+    std::istringstream words(line);
+    std::string what;
+    words >> what;
+    int x = 0;
+    int y = 0;
+    if (what == "window") {
+        words >> process_;
+    } else if (what == "ask") {
+        const char* focus = currentFocus();
+        say(std::string("answer ") + (focus ? focus : "unknown"));
+    } else if (what == "hover" && words >> x >> y) {
+        answerHover(x, y);
+    }
+}
+
+void Watcher::focused(AtspiAccessible* accessible) {
+    const std::uint32_t process = processOf(accessible);
+    const char* kind = kindOf(accessible);
+    focus_.reset(static_cast<AtspiAccessible*>(g_object_ref(accessible)));
+    focusProcess_ = process;
+    say("focus " + std::to_string(process) + " " + (kind ? kind : "unknown"));
+}
+
+Object<AtspiAccessible> Watcher::applicationOf(std::uint32_t process) {
+    const Object<AtspiAccessible> desktop(atspi_get_desktop(0));
+    const int count = desktop ? atspi_accessible_get_child_count(desktop.get(), nullptr) : 0;
+    for (int i = 0; i < count; ++i) {
+        Object<AtspiAccessible> application(atspi_accessible_get_child_at_index(desktop.get(), i, nullptr));
+        if (application && processOf(application.get()) == process)
+            return application;
+    }
+    return nullptr;
+}
+
+Object<AtspiAccessible> Watcher::activeWindowOf(AtspiAccessible* application) {
+    const int count = atspi_accessible_get_child_count(application, nullptr);
+    for (int i = 0; i < count; ++i) {
+        Object<AtspiAccessible> window(atspi_accessible_get_child_at_index(application, i, nullptr));
+        if (window && hasState(window.get(), ATSPI_STATE_ACTIVE))
+            return window;
+    }
+    return nullptr;
+}
+
+Object<AtspiAccessible> Watcher::focusIn(AtspiAccessible* accessible, int& visits) {
+    if (++visits > s_visitedAtMost)
+        return nullptr;
+    if (hasState(accessible, ATSPI_STATE_FOCUSED))
+        return Object<AtspiAccessible>(static_cast<AtspiAccessible*>(g_object_ref(accessible)));
+    const int count = atspi_accessible_get_child_count(accessible, nullptr);
+    for (int i = 0; i < count && visits <= s_visitedAtMost; ++i) {
+        const Object<AtspiAccessible> child(atspi_accessible_get_child_at_index(accessible, i, nullptr));
+        if (!child || !hasState(child.get(), ATSPI_STATE_SHOWING))
+            continue;
+        if (Object<AtspiAccessible> found = focusIn(child.get(), visits))
+            return found;
+    }
+    return nullptr;
+}
+
+/// Asks the application itself each time, so that its answer follows all that it has told before.
+const char* Watcher::currentFocus() {
+    if (process_ == 0)
+        return nullptr;
+    if (!focus_ || focusProcess_ != process_ || !hasState(focus_.get(), ATSPI_STATE_FOCUSED)) {
+        focus_.reset();
+        const Object<AtspiAccessible> application = applicationOf(process_);
+        const Object<AtspiAccessible> window = application ? activeWindowOf(application.get()) : nullptr;
+        int visits = 0;
+        if (window)
+            focus_ = focusIn(window.get(), visits);
+        focusProcess_ = process_;
+    }
+    return focus_ ? kindOf(focus_.get()) : nullptr;
+}
+
+void Watcher::answerHover(int x, int y) {
+    const Object<AtspiAccessible> application = process_ ? applicationOf(process_) : nullptr;
+    const Object<AtspiAccessible> window = application ? activeWindowOf(application.get()) : nullptr;
+    const Object<AtspiComponent> component(window ? atspi_accessible_get_component_iface(window.get()) : nullptr);
+    const Object<AtspiAccessible> found(
+        component ? atspi_component_get_accessible_at_point(component.get(), x, y, ATSPI_COORD_TYPE_SCREEN, nullptr)
+                  : nullptr);
+    const Object<AtspiComponent> inner(found ? atspi_accessible_get_component_iface(found.get()) : nullptr);
+    AtspiRect* area = inner ? atspi_component_get_extents(inner.get(), ATSPI_COORD_TYPE_SCREEN, nullptr) : nullptr;
+    std::ostringstream line;
+    line << "rect";
+    const bool isIn = area && x >= area->x && y >= area->y && x < area->x + area->width && y < area->y + area->height;
+    if (isIn)
+        line << ' ' << area->x << ' ' << area->y << ' ' << area->width << ' ' << area->height;
+    g_free(area);
+    say(line.str());
+}
+
+} // namespace
+
+int watchAccessibility() {
+    Watcher watcher;
+    if (!watcher.reach()) {
+        std::cout << "absent\n" << std::flush;
+        return 0;
+    }
+    watcher.run();
+    return 0;
+}
+
+} // namespace Recorder

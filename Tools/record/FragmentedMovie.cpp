@@ -1,0 +1,411 @@
+#include "Tools/record/FragmentedMovie.h"
+
+#include "Tools/record/Failure.h"
+
+#include <fmt/core.h>
+
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <cstring>
+#include <limits>
+#include <optional>
+#include <utility>
+
+namespace Recorder {
+
+namespace {
+
+constexpr std::uint32_t s_moov = boxType("moov");
+constexpr std::uint32_t s_moof = boxType("moof");
+constexpr std::uint32_t s_free = boxType("free");
+constexpr std::uint64_t s_largestIndex = std::uint64_t{64} << 20;
+constexpr std::uint32_t s_primingOfAAC = 1024; ///< samples that the encoder puts before the sound
+
+/// An atom of the file, which is not in memory.
+struct FileBox {
+    std::uint64_t offset = 0;
+    std::uint64_t size = 0;
+    std::uint64_t headerSize = 8;
+    std::uint32_t type = 0;
+};
+
+bool readAt(int file, std::uint64_t offset, std::span<std::uint8_t> bytes) {
+    std::size_t done = 0;
+    while (done < bytes.size()) {
+        const ssize_t count = pread(file, bytes.data() + done, bytes.size() - done, static_cast<off_t>(offset + done));
+        if (count <= 0)
+            return false;
+        done += static_cast<std::size_t>(count);
+    }
+    return true;
+}
+
+bool writeAt(int file, std::uint64_t offset, std::span<const std::uint8_t> bytes) {
+    std::size_t done = 0;
+    while (done < bytes.size()) {
+        const ssize_t count = pwrite(file, bytes.data() + done, bytes.size() - done, static_cast<off_t>(offset + done));
+        if (count < 0)
+            return false;
+        done += static_cast<std::size_t>(count);
+    }
+    return true;
+}
+
+/// Returns the atom at `offset` if it is whole.
+std::optional<FileBox> boxAt(int file, std::uint64_t offset, std::uint64_t end) {
+    std::array<std::uint8_t, 16> header{};
+    if (end - offset < 8 || !readAt(file, offset, std::span(header).first(8)))
+        return std::nullopt;
+    BoxReader reader(header);
+    FileBox box{offset, reader.u32(), 8, reader.u32()};
+    if (box.size == 1) {
+        if (end - offset < 16 || !readAt(file, offset, header))
+            return std::nullopt;
+        box.size = reader.isWhole() ? BoxReader(std::span(header).subspan(8)).u64() : 0;
+        box.headerSize = 16;
+    }
+    if (box.size < box.headerSize || box.size > end - offset)
+        return std::nullopt;
+    return box;
+}
+
+/// What an atom was before it became free space: the first atom in it tells.
+std::uint32_t formerType(const FileBox& box, const Bytes& bytes) {
+    if (box.type != s_free || bytes.size() < 16)
+        return box.type;
+    const std::uint32_t first = BoxReader(std::span(bytes).subspan(12)).u32();
+    return first == boxType("mvhd") ? s_moov : first == boxType("mfhd") ? s_moof : s_free;
+}
+
+/// Returns the number after the times of creation and change, with which three kinds of headers begin.
+std::uint32_t afterTimes(const Box& header) {
+    BoxReader reader(header.payload);
+    const bool isWide = reader.u32() >> 24 == 1;
+    reader.skip(isWide ? 16 : 8);
+    return reader.u32();
+}
+
+/// Returns the header with another duration, which comes `gap` bytes after the times.
+Bytes withDuration(const Box& header, std::size_t gap, std::uint64_t duration) {
+    Bytes box(header.whole.begin(), header.whole.end());
+    const bool isWide = box.size() > 8 && box[8] == 1;
+    const std::size_t place = (isWide ? 28U : 20U) + gap;
+    const std::size_t size = isWide ? 8 : 4;
+    if (!isWide)
+        duration = std::min<std::uint64_t>(duration, std::numeric_limits<std::uint32_t>::max());
+    for (std::size_t i = 0; i < size && place + i < box.size(); ++i)
+        box[place + i] = static_cast<std::uint8_t>(duration >> (8 * (size - 1 - i)));
+    return box;
+}
+
+} // namespace
+
+FragmentedMovie::FragmentedMovie(int file, const std::string& name) : name_(name) {
+    struct stat status {};
+    if (fstat(file, &status) != 0)
+        throw Failure(fmt::format("{}: cannot be read: {}", name_, std::strerror(errno)));
+    fileBytes_ = static_cast<std::uint64_t>(status.st_size);
+    std::optional<Bytes> fragment; // whose pictures follow
+    std::uint64_t fragmentOffset = 0;
+    std::uint64_t next = 0;
+    while (const auto box = boxAt(file, next, fileBytes_)) {
+        const std::uint64_t offset = std::exchange(next, next + box->size);
+        Bytes bytes;
+        if (box->type == s_moov || box->type == s_moof || box->type == s_free) {
+            if (box->size > s_largestIndex)
+                break;
+            bytes.resize(static_cast<std::size_t>(box->size));
+            if (!readAt(file, offset, bytes))
+                break;
+        }
+        const std::uint32_t type = formerType(*box, bytes);
+        if (type == s_moov && movie_.empty()) {
+            readMovieBox(std::move(bytes));
+            hidden_.push_back(offset);
+            wholeBytes_ = offset + box->size;
+        } else if (type == s_moof && !movie_.empty()) {
+            fragment = std::move(bytes);
+            fragmentOffset = offset;
+        } else if (type == boxType("mdat") && fragment) {
+            readFragment(*fragment, fragmentOffset);
+            hidden_.push_back(fragmentOffset);
+            fragment.reset();
+            wholeBytes_ = offset + box->size;
+        }
+    }
+    if (movie_.empty() || tracks_.empty())
+        throw Failure(fmt::format("{}: the movie has no beginning", name_));
+}
+
+void FragmentedMovie::readMovieBox(Bytes movie) {
+    movie_ = std::move(movie);
+    const Box box = boxesIn(movie_).front();
+    for (const Box& child : boxesIn(box.payload)) {
+        if (child.type == boxType("mvhd")) {
+            timescale_ = std::max(1U, afterTimes(child));
+        } else if (child.type == boxType("trak")) {
+            Track track;
+            track.id = afterTimes(childOf(child, boxType("tkhd")));
+            const Box media = childOf(child, boxType("mdia"));
+            track.timescale = std::max(1U, afterTimes(childOf(media, boxType("mdhd"))));
+            BoxReader handler(childOf(media, boxType("hdlr")).payload);
+            handler.skip(8);
+            track.isVideo = handler.u32() == boxType("vide");
+            tracks_.push_back(std::move(track));
+        }
+    }
+    for (const Box& extension : boxesIn(childOf(box, boxType("mvex")).payload)) {
+        BoxReader reader(extension.payload);
+        reader.skip(4);
+        Track* track = extension.type == boxType("trex") ? trackOf(reader.u32()) : nullptr;
+        if (!track)
+            continue;
+        reader.skip(4);
+        track->defaultDuration = reader.u32();
+        track->defaultSize = reader.u32();
+        track->defaultFlags = reader.u32();
+    }
+}
+
+void FragmentedMovie::readFragment(const Bytes& fragment, std::uint64_t offset) {
+    for (const Box& box : boxesIn(std::span(fragment).subspan(8)))
+        if (box.type == boxType("traf"))
+            readTrackFragment(box, offset);
+}
+
+void FragmentedMovie::readTrackFragment(const Box& box, std::uint64_t fragmentOffset) {
+    BoxReader header(childOf(box, boxType("tfhd")).payload);
+    const std::uint32_t flags = header.u32();
+    Track* track = trackOf(header.u32());
+    if (!track || !header.isWhole())
+        return;
+    const std::uint64_t base = (flags & 0x1) != 0 ? header.u64() : fragmentOffset;
+    if ((flags & 0x2) != 0)
+        header.skip(4);
+    const std::uint32_t duration = (flags & 0x8) != 0 ? header.u32() : track->defaultDuration;
+    const std::uint32_t size = (flags & 0x10) != 0 ? header.u32() : track->defaultSize;
+    const std::uint32_t sampleFlags = (flags & 0x20) != 0 ? header.u32() : track->defaultFlags;
+    BoxReader start(childOf(box, boxType("tfdt")).payload);
+    const bool isWide = start.u32() >> 24 == 1;
+    std::uint64_t time = isWide ? start.u64() : start.u32();
+    for (const Box& run : boxesIn(box.payload)) {
+        if (run.type != boxType("trun"))
+            continue;
+        BoxReader reader(run.payload);
+        const std::uint32_t has = reader.u32();
+        const std::uint32_t count = reader.u32();
+        Chunk chunk{base, 0};
+        if ((has & 0x1) != 0)
+            chunk.offset = base + static_cast<std::uint64_t>(std::int64_t{reader.i32()});
+        const std::uint32_t firstFlags = (has & 0x4) != 0 ? reader.u32() : sampleFlags;
+        for (std::uint32_t i = 0; i < count && reader.isWhole(); ++i) {
+            Sample sample;
+            sample.time = time;
+            sample.duration = (has & 0x100) != 0 ? reader.u32() : duration;
+            sample.size = (has & 0x200) != 0 ? reader.u32() : size;
+            const std::uint32_t own = (has & 0x400) != 0 ? reader.u32() : i == 0 ? firstFlags : sampleFlags;
+            if ((has & 0x800) != 0)
+                reader.skip(4); // pictures are shown in the order in which they are decoded
+            sample.isSync = (own & 0x10000) == 0;
+            if (!reader.isWhole())
+                break;
+            time += sample.duration;
+            track->samples.push_back(sample);
+            ++chunk.samples;
+        }
+        if (chunk.samples > 0)
+            track->chunks.push_back(chunk);
+    }
+}
+
+FragmentedMovie::Track* FragmentedMovie::trackOf(std::uint32_t id) {
+    const auto found =
+        std::find_if(tracks_.begin(), tracks_.end(), [id](const Track& track) { return track.id == id; });
+    return found == tracks_.end() ? nullptr : &*found;
+}
+
+std::uint64_t FragmentedMovie::frames() const {
+    return tracks_.front().samples.size();
+}
+
+std::uint64_t FragmentedMovie::durationOf(const Track& track) const {
+    return track.samples.empty() ? 0 : track.samples.back().time + track.samples.back().duration;
+}
+
+double FragmentedMovie::duration() const {
+    return static_cast<double>(durationOf(tracks_.front())) / tracks_.front().timescale;
+}
+
+std::uint64_t FragmentedMovie::inMovieTime(const Track& track, std::uint64_t duration) const {
+    return (duration * timescale_ + track.timescale / 2) / track.timescale;
+}
+
+void FragmentedMovie::makeOrdinary(int file) const {
+    if (frames() == 0)
+        throw Failure(fmt::format("{}: no frame of the movie is whole", name_));
+    Bytes index = ordinaryIndex();
+    const auto failed = [this](const char* what) {
+        return Failure(fmt::format("{}: {}: {}", name_, what, std::strerror(errno)), ExitLoss);
+    };
+    if (ftruncate(file, static_cast<off_t>(wholeBytes_)) != 0)
+        throw failed("cannot be cut to its whole fragments");
+    // The new index comes to the disk as free space first. Until its type is set, the fragments still have theirs, or
+    // can be told by what is in them.
+    constexpr std::size_t typeAt = 4;
+    const auto setType = [&](std::uint64_t box, std::uint32_t type) {
+        BoxWriter writer;
+        writer.u32(type);
+        if (!writeAt(file, box + typeAt, writer.result()))
+            throw failed("cannot be written");
+    };
+    const std::uint32_t hiddenType = boxType("skip");
+    for (std::size_t i = 0; i < 4; ++i)
+        index[typeAt + i] = static_cast<std::uint8_t>(hiddenType >> (24 - 8 * i));
+    if (!writeAt(file, wholeBytes_, index) || fsync(file) != 0)
+        throw failed("the index cannot be written");
+    for (const std::uint64_t box : hidden_)
+        setType(box, s_free);
+    setType(wholeBytes_, s_moov);
+    if (fsync(file) != 0)
+        throw failed("cannot be written");
+}
+
+Bytes FragmentedMovie::ordinaryIndex() const {
+    BoxWriter writer;
+    const Box movie = boxesIn(movie_).front();
+    writer.box(s_moov, [&] {
+        for (const Box& child : boxesIn(movie.payload)) {
+            if (child.type == boxType("trak")) {
+                writeTrack(writer, child);
+            } else if (child.type == boxType("mvhd")) {
+                std::uint64_t longest = 0;
+                for (const Track& track : tracks_)
+                    longest = std::max(longest, inMovieTime(track, durationOf(track)));
+                writer.bytes(withDuration(child, 4, longest));
+            } else if (child.type != boxType("mvex")) {
+                writer.bytes(child.whole);
+            }
+        }
+    });
+    return writer.result();
+}
+
+void FragmentedMovie::writeTrack(BoxWriter& writer, const Box& box) const {
+    const std::uint32_t id = afterTimes(childOf(box, boxType("tkhd")));
+    const auto track =
+        std::find_if(tracks_.begin(), tracks_.end(), [id](const Track& candidate) { return candidate.id == id; });
+    if (track == tracks_.end() || track->samples.empty())
+        return;
+    const std::uint64_t duration = inMovieTime(*track, durationOf(*track));
+    writer.box(boxType("trak"), [&] {
+        for (const Box& child : boxesIn(box.payload)) {
+            if (child.type == boxType("tkhd")) {
+                writer.bytes(withDuration(child, 8, duration));
+                if (!track->isVideo)
+                    writer.box(boxType("edts"), [&] {
+                        writer.fullBox(boxType("elst"), 1, 0, [&] {
+                            writer.u32(1);
+                            writer.u64(duration);
+                            writer.u64(s_primingOfAAC);
+                            writer.u32(0x10000);
+                        });
+                    });
+            } else if (child.type == boxType("mdia")) {
+                writeMedia(writer, child, *track);
+            } else if (child.type != boxType("edts")) {
+                writer.bytes(child.whole);
+            }
+        }
+    });
+}
+
+void FragmentedMovie::writeMedia(BoxWriter& writer, const Box& box, const Track& track) const {
+    writer.box(boxType("mdia"), [&] {
+        for (const Box& child : boxesIn(box.payload)) {
+            if (child.type == boxType("mdhd")) {
+                writer.bytes(withDuration(child, 4, durationOf(track)));
+            } else if (child.type == boxType("minf")) {
+                writer.box(boxType("minf"), [&] {
+                    for (const Box& part : boxesIn(child.payload)) {
+                        if (part.type == boxType("stbl"))
+                            writeTables(writer, part, track);
+                        else
+                            writer.bytes(part.whole);
+                    }
+                });
+            } else {
+                writer.bytes(child.whole);
+            }
+        }
+    });
+}
+
+void FragmentedMovie::writeTables(BoxWriter& writer, const Box& box, const Track& track) const {
+    /// Numbers that stand for a row of equal ones.
+    struct Run {
+        std::uint32_t first;
+        std::uint32_t value;
+    };
+    const auto& samples = track.samples;
+    std::vector<Run> durations; // count, duration
+    for (std::size_t i = 0; i < samples.size(); ++i) {
+        const bool hasNext = i + 1 < samples.size() && samples[i + 1].time >= samples[i].time;
+        const std::uint64_t length =
+            hasNext ? samples[i + 1].time - samples[i].time : std::uint64_t{samples[i].duration};
+        const auto duration = static_cast<std::uint32_t>(std::min<std::uint64_t>(length, 0xffffffff));
+        if (durations.empty() || durations.back().value != duration)
+            durations.push_back({0, duration});
+        ++durations.back().first;
+    }
+    std::vector<Run> chunkSizes; // number of the first chunk, samples in it
+    for (std::size_t i = 0; i < track.chunks.size(); ++i)
+        if (chunkSizes.empty() || chunkSizes.back().value != track.chunks[i].samples)
+            chunkSizes.push_back({static_cast<std::uint32_t>(i + 1), track.chunks[i].samples});
+    std::vector<std::uint32_t> syncs;
+    for (std::size_t i = 0; i < samples.size(); ++i)
+        if (samples[i].isSync)
+            syncs.push_back(static_cast<std::uint32_t>(i + 1));
+
+    const auto count = [&writer](std::size_t number) { writer.u32(static_cast<std::uint32_t>(number)); };
+    writer.box(boxType("stbl"), [&] {
+        writer.bytes(childOf(box, boxType("stsd")).whole);
+        writer.fullBox(boxType("stts"), 0, 0, [&] {
+            count(durations.size());
+            for (const Run& run : durations) {
+                writer.u32(run.first);
+                writer.u32(run.value);
+            }
+        });
+        if (syncs.size() < samples.size())
+            writer.fullBox(boxType("stss"), 0, 0, [&] {
+                count(syncs.size());
+                for (const std::uint32_t sync : syncs)
+                    writer.u32(sync);
+            });
+        writer.fullBox(boxType("stsc"), 0, 0, [&] {
+            count(chunkSizes.size());
+            for (const Run& run : chunkSizes) {
+                writer.u32(run.first);
+                writer.u32(run.value);
+                writer.u32(1);
+            }
+        });
+        writer.fullBox(boxType("stsz"), 0, 0, [&] {
+            writer.u32(0);
+            count(samples.size());
+            for (const Sample& sample : samples)
+                writer.u32(sample.size);
+        });
+        writer.fullBox(boxType("co64"), 0, 0, [&] {
+            count(track.chunks.size());
+            for (const Chunk& chunk : track.chunks)
+                writer.u64(chunk.offset);
+        });
+    });
+}
+
+} // namespace Recorder

@@ -1,0 +1,26 @@
+#pragma once
+
+// Instants of the machine's monotonic clock, which every part of the recorder uses.
+
+#include <cstdint>
+
+namespace Recorder {
+
+/// Nanoseconds of CLOCK_MONOTONIC.
+using Instant = std::int64_t;
+
+inline constexpr Instant s_second = 1'000'000'000;  ///< nanoseconds of a second
+inline constexpr Instant s_millisecond = 1'000'000; ///< nanoseconds of a millisecond
+
+/// Returns the present instant.
+Instant now();
+
+/// Waits until `instant`, or returns at once if it has passed.
+void sleepUntil(Instant instant);
+
+/// Returns the middle between two instants.
+constexpr Instant middleOf(Instant first, Instant second) {
+    return first + (second - first) / 2;
+}
+
+} // namespace Recorder

@@ -1,0 +1,111 @@
+#pragma once
+
+// A recording from its start to its end.
+
+#include "Tools/record/AccessibilityProcess.h"
+#include "Tools/record/Camera.h"
+#include "Tools/record/CaptureTarget.h"
+#include "Tools/record/ControlSocket.h"
+#include "Tools/record/CursorObserver.h"
+#include "Tools/record/HeldInput.h"
+#include "Tools/record/Journal.h"
+#include "Tools/record/KeyObserver.h"
+#include "Tools/record/MachineObserver.h"
+#include "Tools/record/Mailbox.h"
+#include "Tools/record/Options.h"
+#include "Tools/record/PointerObserver.h"
+#include "Tools/record/RecordingFolder.h"
+#include "Tools/record/SoundSource.h"
+#include "Tools/record/StopSignals.h"
+#include "Tools/record/TrafficObserver.h"
+#include "Tools/record/WindowObserver.h"
+
+#include <atomic>
+#include <exception>
+#include <memory>
+#include <optional>
+#include <string>
+
+namespace Recorder {
+
+/// Why a recording ended.
+enum class End { Duration, Signal, Stop, Window, Disk, Error };
+
+class RecorderLoop {
+public:
+    /// Opens everything that a recording needs. Throws `Failure`; nothing is created then.
+    explicit RecorderLoop(const Options& options);
+    ~RecorderLoop();
+
+    /// Records until something ends it, and makes the movie. Returns how the program ends.
+    int run();
+
+private:
+    /// Observers of the display, which live as long as something is recorded.
+    struct Observers;
+
+    void reachAccessibility();
+    void open();
+    void selectInput();
+    void observe();
+    void waitForSomething();
+    void takeEvents();
+    void takeEvent(const xcb_generic_event_t& event);
+    void takeInput(const xcb_ge_generic_event_t& event);
+    void takeKey(const xcb_input_raw_key_press_event_t& event);
+    ZULMetaData::Modifiers buttonModifiers() const;
+    void takeMail();
+    void takeSignals();
+    void takeFocus();
+    void began(Instant zero);
+    void lookAfterDisk();
+    void lookAfterTime();
+    void showStatus();
+    void hover();
+    void pause();
+    void resume();
+    std::string obey(Command command);
+    void windowChanged(Instant instant, std::uint32_t process);
+    void fail(const std::string& why);
+    void end(End why, Instant instant);
+    void waitForHeldKeys();
+    bool save();
+    void report(bool isSaved) const;
+    Instant endOfDuration() const;
+
+    Options options_;
+    XConnection connection_;
+    CaptureTarget target_;
+    StopSignals signals_; ///< before any thread is started
+    ScreenGrabber grabber_;
+    ServerClock clock_;
+    PrivacyFilter privacy_;
+    std::unique_ptr<AccessibilityProcess> accessibility_;
+    ControlSocket control_;
+    RecordingFolder folder_;
+    std::atomic<bool> isDiskFull_ = false;
+    Mailbox mailbox_;
+    std::unique_ptr<VideoWriter> writer_;
+    std::unique_ptr<Journal> journal_;
+    std::unique_ptr<HeldInput> input_;
+    std::unique_ptr<Observers> observers_;
+    std::unique_ptr<Camera> camera_;
+    std::unique_ptr<SoundSource> sound_; ///< of which nothing is there without --audio
+
+    std::optional<End> end_;
+    Instant endInstant_ = 0;
+    std::string error_;
+    std::optional<Instant> zero_;
+    Instant paused_ = 0;
+    std::optional<Instant> pausedAt_;
+    std::optional<Position> hovered_;
+    Instant nextDiskCheck_ = 0;
+    Instant nextRate_ = 0;
+    std::uint64_t ratedBytes_ = 0; ///< of the movie when its rate was taken last
+    std::uint64_t fastest_ = 0;    ///< bytes that the movie grew by in a second
+    std::uint8_t inputOpcode_ = 0;
+    Instant nextStatus_ = 0;
+    bool hasStatus_ = false;
+};
+
+} // namespace Recorder

@@ -1,0 +1,121 @@
+#include "Tools/record/RecordingFolder.h"
+
+#include "Tools/record/Failure.h"
+
+#include <fmt/core.h>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/statvfs.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <system_error>
+
+namespace Recorder {
+
+namespace fs = std::filesystem;
+
+namespace {
+
+constexpr std::uint64_t s_firstReserve = std::uint64_t{2} << 20;
+constexpr std::uint64_t s_leastFree = std::uint64_t{2} << 20; ///< beside the reserve, to begin at all
+
+void requireAbsent(const fs::path& path, const char* advice) {
+    std::error_code error;
+    if (fs::symlink_status(path, error).type() != fs::file_type::not_found)
+        throw Refusal(fmt::format("{}: exists already; {}", path.string(), advice));
+}
+
+bool isFull(int error) {
+    return error == ENOSPC || error == EDQUOT;
+}
+
+} // namespace
+
+fs::path RecordingFolder::folderOf(const fs::path& output) {
+    fs::path folder = output;
+    folder += ".recording";
+    return folder;
+}
+
+RecordingFolder::RecordingFolder(const fs::path& output) : output_(output), folder_(folderOf(output)) {
+    requireAbsent(output_, "choose another name, since nothing is ever replaced");
+    requireAbsent(folder_, "it may hold a recording that was cut short: 'zulm record --recover' saves that one");
+    if (mkdir(folder_.c_str(), 0700) != 0) {
+        const int error = errno;
+        const std::string sentence = fmt::format("{}: cannot be created: {}", folder_.string(), std::strerror(error));
+        if (isFull(error))
+            throw Failure(sentence + "; free some space first");
+        throw Refusal(sentence);
+    }
+    reserve_ = FileHandle(open((folder_ / "reserve").c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
+    if (!reserve_ || !reserve(s_firstReserve) || freeBytes() < s_leastFree) {
+        remove();
+        throw Failure(fmt::format("{}: the file system has too little space left to record; free some space first",
+                                  output_.string()));
+    }
+}
+
+bool RecordingFolder::reserve(std::uint64_t bytes) {
+    const std::lock_guard lock(mutex_);
+    if (!reserve_)
+        return false;
+    if (bytes <= reserved_)
+        return true;
+    if (posix_fallocate(reserve_.get(), 0, static_cast<off_t>(bytes)) != 0)
+        return false;
+    reserved_ = bytes;
+    return true;
+}
+
+bool RecordingFolder::releaseReserve() {
+    const std::lock_guard lock(mutex_);
+    if (!reserve_)
+        return false;
+    unlink((folder_ / "reserve").c_str());
+    reserve_.close();
+    return true;
+}
+
+std::uint64_t RecordingFolder::freeBytes() const {
+    struct statvfs status {};
+    if (statvfs(folder_.c_str(), &status) != 0)
+        return 0;
+    return std::uint64_t{status.f_bavail} * status.f_frsize;
+}
+
+void RecordingFolder::publish() {
+    renameWithoutReplacing(movie(), output_);
+    syncFolder(output_.parent_path());
+}
+
+void RecordingFolder::remove() {
+    releaseReserve();
+    std::error_code ignored; // what is left says so by being there
+    fs::remove_all(folder_, ignored);
+}
+
+void renameWithoutReplacing(const fs::path& from, const fs::path& to) {
+    if (renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE) == 0)
+        return;
+    int error = errno;
+    if (error == EINVAL || error == ENOSYS) { // a file system that cannot do it: a second name never replaces either
+        if (link(from.c_str(), to.c_str()) == 0) {
+            unlink(from.c_str());
+            return;
+        }
+        error = errno;
+    }
+    throw Failure(fmt::format("{}: cannot be made from {}: {}", to.string(), from.string(), std::strerror(error)),
+                  ExitLoss);
+}
+
+void syncFolder(const fs::path& folder) {
+    const FileHandle handle(open(folder.empty() ? "." : folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    if (handle)
+        fsync(handle.get());
+}
+
+} // namespace Recorder

@@ -1,0 +1,175 @@
+#include "Tools/record/ScreenGrabber.h"
+
+#include "Tools/record/Failure.h"
+
+#include <fmt/core.h>
+#include <xcb/composite.h>
+
+#include <sys/ipc.h>
+#include <sys/shm.h>
+
+namespace Recorder {
+
+namespace {
+
+constexpr std::uint32_t s_allPlanes = 0xffffffff;
+
+const xcb_format_t* formatOfDepth(const xcb_setup_t& setup, std::uint8_t depth) {
+    for (auto formats = xcb_setup_pixmap_formats_iterator(&setup); formats.rem > 0; xcb_format_next(&formats))
+        if (formats.data->depth == depth)
+            return formats.data;
+    return nullptr;
+}
+
+const xcb_visualtype_t* visualOf(const xcb_screen_t& screen, xcb_visualid_t id) {
+    for (auto depths = xcb_screen_allowed_depths_iterator(&screen); depths.rem > 0; xcb_depth_next(&depths))
+        for (auto visuals = xcb_depth_visuals_iterator(depths.data); visuals.rem > 0; xcb_visualtype_next(&visuals))
+            if (visuals.data->visual_id == id)
+                return visuals.data;
+    return nullptr;
+}
+
+std::optional<PixelLayout> layoutOf(int bitsPerPixel, const xcb_visualtype_t& visual) {
+    if (bitsPerPixel == 32 && visual.red_mask == 0xff0000 && visual.blue_mask == 0xff)
+        return PixelLayout::BGRX32;
+    if (bitsPerPixel == 32 && visual.red_mask == 0xff && visual.blue_mask == 0xff0000)
+        return PixelLayout::RGBX32;
+    if (bitsPerPixel == 24 && visual.red_mask == 0xff0000 && visual.blue_mask == 0xff)
+        return PixelLayout::BGR24;
+    if (bitsPerPixel == 16 && visual.red_mask == 0xf800 && visual.blue_mask == 0x1f)
+        return PixelLayout::RGB565;
+    return std::nullopt;
+}
+
+} // namespace
+
+ScreenGrabber::ScreenGrabber(const std::string& display, Area area, xcb_window_t window)
+    : connection_(display), area_(area), window_(window) {
+    findLayout();
+    if (window_ != XCB_WINDOW_NONE)
+        xcb_composite_redirect_window(connection_.get(), window_, XCB_COMPOSITE_REDIRECT_AUTOMATIC);
+    shareMemory();
+}
+
+ScreenGrabber::~ScreenGrabber() {
+    if (memory_)
+        shmdt(memory_);
+}
+
+void ScreenGrabber::findLayout() {
+    const xcb_setup_t* setup = xcb_get_setup(connection_.get());
+    const xcb_screen_t& screen = connection_.screen();
+    const xcb_format_t* format = formatOfDepth(*setup, screen.root_depth);
+    const xcb_visualtype_t* visual = visualOf(screen, screen.root_visual);
+    const bool isLittleEndian = setup->image_byte_order == XCB_IMAGE_ORDER_LSB_FIRST;
+    const auto layout =
+        format && visual && isLittleEndian ? layoutOf(format->bits_per_pixel, *visual) : std::optional<PixelLayout>();
+    if (!layout)
+        throw Refusal(fmt::format("the X display has pixels of depth {}, which cannot be recorded; use one of depth 24",
+                                  screen.root_depth));
+    layout_ = *layout;
+    const int pad = format->scanline_pad;
+    bytesPerLine_ = (area_.width * format->bits_per_pixel + pad - 1) / pad * pad / 8;
+}
+
+/// A server on another machine, or in another container, cannot share memory: pictures then come as replies.
+void ScreenGrabber::shareMemory() {
+    if (!connection_.has(xcb_shm_id))
+        return;
+    const auto size = static_cast<std::size_t>(bytesPerLine_) * static_cast<std::size_t>(area_.height);
+    const int identifier = shmget(IPC_PRIVATE, size, IPC_CREAT | 0600);
+    if (identifier < 0)
+        return;
+    void* memory = shmat(identifier, nullptr, 0);
+    const xcb_shm_seg_t segment = xcb_generate_id(connection_.get());
+    Reply<xcb_generic_error_t> error;
+    const bool isMapped = reinterpret_cast<std::intptr_t>(memory) != -1;
+    if (isMapped)
+        error.reset(
+            xcb_request_check(connection_.get(), xcb_shm_attach_checked(connection_.get(), segment,
+                                                                        static_cast<std::uint32_t>(identifier), 0)));
+    shmctl(identifier, IPC_RMID, nullptr); // it goes with the last process that uses it
+    if (!isMapped)
+        return;
+    if (error) {
+        shmdt(memory);
+        return;
+    }
+    memory_ = memory;
+    segment_ = segment;
+}
+
+/// The window's pixmap is another one after each change of its size.
+xcb_drawable_t ScreenGrabber::drawable() {
+    if (window_ == XCB_WINDOW_NONE)
+        return connection_.root();
+    const std::optional<Area> area = connection_.areaOf(window_);
+    if (!area)
+        return XCB_NONE;
+    if (pixmap_ && area->width == pixmapArea_.width && area->height == pixmapArea_.height)
+        return pixmap_;
+    if (pixmap_)
+        xcb_free_pixmap(connection_.get(), pixmap_);
+    pixmap_ = xcb_generate_id(connection_.get());
+    const Reply<xcb_generic_error_t> error(xcb_request_check(
+        connection_.get(), xcb_composite_name_window_pixmap_checked(connection_.get(), window_, pixmap_)));
+    if (error)
+        pixmap_ = XCB_NONE;
+    pixmapArea_ = *area;
+    return pixmap_;
+}
+
+bool ScreenGrabber::notePointer(xcb_query_pointer_cookie_t cookie, GrabbedPicture& picture) {
+    const Reply<xcb_query_pointer_reply_t> reply(xcb_query_pointer_reply(connection_.get(), cookie, nullptr));
+    picture.hasPointer = reply && reply->same_screen;
+    if (picture.hasPointer)
+        picture.pointer = {reply->root_x, reply->root_y};
+    return picture.hasPointer;
+}
+
+std::optional<GrabbedPicture> ScreenGrabber::grab() {
+    xcb_connection_t* connection = connection_.get();
+    const xcb_drawable_t source = drawable();
+    if (source == XCB_NONE)
+        return std::nullopt;
+    const bool isRoot = source == connection_.root();
+    const auto x = static_cast<std::int16_t>(isRoot ? area_.x : 0);
+    const auto y = static_cast<std::int16_t>(isRoot ? area_.y : 0);
+    const auto width = static_cast<std::uint16_t>(area_.width);
+    const auto height = static_cast<std::uint16_t>(area_.height);
+    GrabbedPicture picture;
+    picture.bytesPerLine = bytesPerLine_;
+    const Instant asked = now();
+    picture.pointerInstant = asked;
+    const auto pointerCookie = xcb_query_pointer(connection, connection_.root());
+    if (segment_ != 0) {
+        const auto cookie = xcb_shm_get_image(connection, source, x, y, width, height, s_allPlanes,
+                                              XCB_IMAGE_FORMAT_Z_PIXMAP, segment_, 0);
+        const Reply<xcb_shm_get_image_reply_t> reply(xcb_shm_get_image_reply(connection, cookie, nullptr));
+        picture.pixels = reply ? static_cast<const std::uint8_t*>(memory_) : nullptr;
+    } else {
+        const auto cookie =
+            xcb_get_image(connection, XCB_IMAGE_FORMAT_Z_PIXMAP, source, x, y, width, height, s_allPlanes);
+        image_.reset(xcb_get_image_reply(connection, cookie, nullptr));
+        const auto needed = static_cast<std::int64_t>(bytesPerLine_) * area_.height;
+        const bool isWhole = image_ && xcb_get_image_data_length(image_.get()) >= needed;
+        picture.pixels = isWhole ? xcb_get_image_data(image_.get()) : nullptr;
+    }
+    picture.instant = middleOf(asked, now());
+    notePointer(pointerCookie, picture);
+    if (!picture.pixels)
+        return std::nullopt;
+    return picture;
+}
+
+std::optional<GrabbedPicture> ScreenGrabber::askPointer() {
+    GrabbedPicture picture;
+    const Instant asked = now();
+    picture.pointerInstant = asked;
+    if (!notePointer(xcb_query_pointer(connection_.get(), connection_.root()), picture))
+        return std::nullopt;
+    picture.instant = middleOf(asked, now());
+    return picture;
+}
+
+} // namespace Recorder

@@ -1,0 +1,217 @@
+#include "Tools/record/WindowObserver.h"
+
+#include "ZULMetaDataBridge/Source/EntryTexts.h"
+
+#include <algorithm>
+#include <utility>
+
+namespace Recorder {
+
+using namespace ZULMetaData;
+
+namespace {
+
+Rect rectOf(const Area& area) {
+    return {area.x, area.y, area.width, area.height};
+}
+
+/// Returns a text of a property of type STRING, which is ISO 8859-1, as UTF-8.
+std::string fromLatin1(const std::string& text) {
+    std::string result;
+    for (const char letter : text) {
+        const auto byte = static_cast<unsigned char>(letter);
+        if (byte < 0x80) {
+            result += letter;
+        } else {
+            result += static_cast<char>(0xc0 | byte >> 6);
+            result += static_cast<char>(0x80 | (byte & 0x3f));
+        }
+    }
+    return result;
+}
+
+std::string upToZero(const std::string& text) {
+    return text.substr(0, text.find('\0'));
+}
+
+/// Returns the second of the two texts of WM_CLASS.
+std::string classOf(const std::string& property) {
+    const std::size_t end = property.find('\0');
+    return end == std::string::npos ? std::string() : upToZero(property.substr(end + 1));
+}
+
+} // namespace
+
+WindowObserver::WindowObserver(XConnection& connection, const ServerClock& clock, Journal& journal,
+                               PrivacyFilter& privacy, std::function<void(Instant, std::uint32_t)> changed)
+    : connection_(connection), clock_(clock), journal_(journal), privacy_(privacy), changed_(std::move(changed)),
+      activeWindowAtom_(connection.atom("_NET_ACTIVE_WINDOW")), supportedAtom_(connection.atom("_NET_SUPPORTED")),
+      nameAtom_(connection.atom("_NET_WM_NAME")), processAtom_(connection.atom("_NET_WM_PID")) {
+    const std::uint32_t events =
+        XCB_EVENT_MASK_PROPERTY_CHANGE | XCB_EVENT_MASK_SUBSTRUCTURE_NOTIFY | XCB_EVENT_MASK_STRUCTURE_NOTIFY;
+    xcb_change_window_attributes(connection_.get(), connection_.root(), XCB_CW_EVENT_MASK, &events);
+    follow(now());
+}
+
+/// Whether a window manager says which window is active.
+bool WindowObserver::isManaged() {
+    if (!isManaged_) {
+        const auto supported = connection_.numbers(connection_.root(), supportedAtom_);
+        isManaged_ = std::find(supported.begin(), supported.end(), activeWindowAtom_) != supported.end();
+    }
+    return *isManaged_;
+}
+
+/// Keys go to the window below the pointer if the focus is on the root window.
+xcb_window_t WindowObserver::focusedWindow() const {
+    const auto cookie = xcb_get_input_focus(connection_.get());
+    const Reply<xcb_get_input_focus_reply_t> reply(xcb_get_input_focus_reply(connection_.get(), cookie, nullptr));
+    if (!reply || reply->focus == XCB_INPUT_FOCUS_NONE)
+        return XCB_NONE;
+    if (reply->focus != XCB_INPUT_FOCUS_POINTER_ROOT && reply->focus != connection_.root())
+        return reply->focus;
+    const auto pointerCookie = xcb_query_pointer(connection_.get(), connection_.root());
+    const Reply<xcb_query_pointer_reply_t> pointer(xcb_query_pointer_reply(connection_.get(), pointerCookie, nullptr));
+    return pointer ? pointer->child : xcb_window_t{XCB_NONE};
+}
+
+xcb_window_t WindowObserver::activeWindow() {
+    if (!isManaged())
+        return focusedWindow();
+    const auto windows = connection_.numbers(connection_.root(), activeWindowAtom_);
+    return windows.empty() ? xcb_window_t{XCB_NONE} : windows.front();
+}
+
+void WindowObserver::follow(Instant instant) {
+    const xcb_window_t active = activeWindow();
+    if (active == active_ && !isFirst_)
+        return;
+    isFirst_ = false;
+    active_ = active;
+    readWindow(instant);
+}
+
+/// Returns the window with the application's class: `window`, one around it, or one in it.
+xcb_window_t WindowObserver::clientIn(xcb_window_t window) const {
+    const auto hasClass = [this](xcb_window_t candidate) {
+        return connection_.text(candidate, XCB_ATOM_WM_CLASS).has_value();
+    };
+    for (xcb_window_t outer = window; outer != XCB_NONE && outer != connection_.root();) {
+        if (hasClass(outer))
+            return outer;
+        const auto cookie = xcb_query_tree(connection_.get(), outer);
+        const Reply<xcb_query_tree_reply_t> tree(xcb_query_tree_reply(connection_.get(), cookie, nullptr));
+        outer = tree ? tree->parent : xcb_window_t{XCB_NONE};
+    }
+    const auto cookie = xcb_query_tree(connection_.get(), window);
+    const Reply<xcb_query_tree_reply_t> tree(xcb_query_tree_reply(connection_.get(), cookie, nullptr));
+    if (!tree)
+        return window;
+    const xcb_window_t* children = xcb_query_tree_children(tree.get());
+    const xcb_window_t* end = children + xcb_query_tree_children_length(tree.get());
+    const xcb_window_t* child = std::find_if(children, end, hasClass);
+    return child == end ? window : *child;
+}
+
+void WindowObserver::readWindow(Instant instant) {
+    const std::uint32_t nothing = XCB_EVENT_MASK_NO_EVENT;
+    if (client_ != XCB_NONE)
+        xcb_change_window_attributes(connection_.get(), client_, XCB_CW_EVENT_MASK, &nothing);
+    client_ = active_ == XCB_NONE ? xcb_window_t{XCB_NONE} : clientIn(active_);
+    frame_ = XCB_NONE;
+    process_ = 0;
+    if (client_ != XCB_NONE) {
+        const std::uint32_t events = XCB_EVENT_MASK_PROPERTY_CHANGE | XCB_EVENT_MASK_STRUCTURE_NOTIFY;
+        xcb_change_window_attributes(connection_.get(), client_, XCB_CW_EVENT_MASK, &events);
+        frame_ = connection_.topLevelOf(client_);
+        const auto process = connection_.numbers(client_, processAtom_);
+        process_ = process.empty() ? 0 : process.front();
+    }
+    readTexts(instant);
+    readArea(instant);
+    changed_(instant, process_);
+}
+
+void WindowObserver::readTexts(Instant instant) {
+    std::string title;
+    std::string app;
+    if (client_ != XCB_NONE) {
+        xcb_atom_t type = XCB_ATOM_NONE;
+        if (const auto name = connection_.text(client_, nameAtom_))
+            title = upToZero(*name);
+        else if (const auto oldName = connection_.text(client_, XCB_ATOM_WM_NAME, &type))
+            title = type == XCB_ATOM_STRING ? fromLatin1(upToZero(*oldName)) : upToZero(*oldName);
+        app = classOf(connection_.text(client_, XCB_ATOM_WM_CLASS).value_or(""));
+    }
+    const bool isDenied = privacy_.denies(app, title);
+    privacy_.setWindow(instant, isDenied);
+    journal_.note<TopmostAppNameKind>(instant, app);
+    journal_.note<TopmostWindowTitleKind>(instant, isDenied ? std::string() : title);
+}
+
+void WindowObserver::readArea(Instant instant) {
+    const xcb_window_t outer = frame_ != XCB_NONE ? frame_ : client_;
+    const Area area = outer == XCB_NONE ? Area() : connection_.areaOf(outer).value_or(Area());
+    journal_.note<TopmostWindowKind>(instant, rectOf(area));
+}
+
+void WindowObserver::propertyChanged(const xcb_property_notify_event_t& event) {
+    const Instant instant = clock_.instantOf(event.time);
+    if (event.window == connection_.root()) {
+        if (event.atom == supportedAtom_)
+            isManaged_.reset();
+        if (event.atom == supportedAtom_ || event.atom == activeWindowAtom_)
+            follow(instant);
+    } else if (event.window == client_) {
+        if (event.atom == nameAtom_ || event.atom == XCB_ATOM_WM_NAME || event.atom == XCB_ATOM_WM_CLASS)
+            readTexts(instant);
+    }
+}
+
+void WindowObserver::configured(const xcb_configure_notify_event_t& event) {
+    if (event.window != frame_ && event.window != client_)
+        return;
+    if (event.window == client_) // a window manager may have put it into a frame
+        frame_ = connection_.topLevelOf(client_);
+    readArea(now());
+}
+
+void WindowObserver::destroyed(xcb_window_t window) {
+    if (window != client_ && window != frame_ && window != active_)
+        return;
+    client_ = frame_ = XCB_NONE;
+    isFirst_ = true; // the next active window may have the same number
+    follow(now());
+}
+
+void WindowObserver::poll() {
+    if (!isManaged())
+        follow(now());
+}
+
+std::optional<Area> WindowObserver::innermostAt(Position pointer) const {
+    xcb_window_t window = connection_.root();
+    for (;;) {
+        const auto cookie =
+            xcb_translate_coordinates(connection_.get(), connection_.root(), window,
+                                      static_cast<std::int16_t>(pointer.x), static_cast<std::int16_t>(pointer.y));
+        const Reply<xcb_translate_coordinates_reply_t> reply(
+            xcb_translate_coordinates_reply(connection_.get(), cookie, nullptr));
+        if (!reply)
+            return std::nullopt;
+        if (reply->child == XCB_WINDOW_NONE)
+            return window == connection_.root() ? std::nullopt : connection_.areaOf(window);
+        window = reply->child;
+    }
+}
+
+void WindowObserver::hover(Instant instant, Position pointer) {
+    noteHover(instant, innermostAt(pointer).value_or(Area()));
+}
+
+void WindowObserver::noteHover(Instant instant, const Area& area) {
+    if (!privacy_.isDenied())
+        journal_.note<HoverRectKind>(instant, rectOf(area));
+}
+
+} // namespace Recorder

@@ -1,0 +1,54 @@
+#include "Tools/record/AccessibilityProcess.h"
+#include "Tools/record/ControlSocket.h"
+#include "Tools/record/Failure.h"
+#include "Tools/record/Options.h"
+#include "Tools/record/RecorderLoop.h"
+#include "Tools/record/Recovery.h"
+#include "Tools/record/VideoWriter.h"
+
+extern "C" {
+#include <libavutil/log.h>
+}
+
+#include <cstdio>
+#include <exception>
+
+namespace Recorder {
+
+namespace {
+
+int record(const Options& options) {
+    VideoWriter::requireCodec(options.video.codec);
+    RecorderLoop loop(options);
+    return loop.run();
+}
+
+int run(const Options& options) {
+    switch (options.task) {
+    case Task::Record: return record(options);
+    case Task::Recover: return recover(options.folder, options.output, options.deletesFolder);
+    case Task::Pause: return sendCommand(Command::Pause, options.socket);
+    case Task::Resume: return sendCommand(Command::Resume, options.socket);
+    case Task::Stop: return sendCommand(Command::Stop, options.socket);
+    case Task::WatchAccessibility: return watchAccessibility();
+    }
+    return ExitFailed;
+}
+
+} // namespace
+
+} // namespace Recorder
+
+int main(int argc, char** argv) {
+    av_log_set_level(AV_LOG_FATAL);
+    try {
+        const auto options = Recorder::optionsOf(argc, argv);
+        return options ? Recorder::run(*options) : Recorder::ExitFine;
+    } catch (const Recorder::Failure& failure) {
+        std::fprintf(stderr, "zulm record: %s\n", failure.what());
+        return failure.code();
+    } catch (const std::exception& error) {
+        std::fprintf(stderr, "zulm record: %s\n", error.what());
+        return Recorder::ExitFailed;
+    }
+}
