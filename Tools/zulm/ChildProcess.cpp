@@ -59,6 +59,7 @@ class Child {
 public:
     Child(const std::vector<std::string>& words, const Pipe& output, const Pipe& errors) {
         std::vector<char*> arguments;
+        arguments.reserve(words.size() + 1);
         for (const std::string& word : words)
             arguments.push_back(const_cast<char*>(word.c_str())); // never written to
         arguments.push_back(nullptr);

@@ -61,6 +61,7 @@ EditList listWithout(const std::vector<std::string>& removed, const Recording& r
                                   "give what is kept with --keep",
                                   recording.name()));
     std::vector<EditRange> ranges;
+    ranges.reserve(removed.size());
     for (const std::string& text : removed)
         ranges.push_back(parseEditRange(text));
     return EditList::without(std::move(ranges), Rational::of(*duration));
