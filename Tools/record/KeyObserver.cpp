@@ -4,7 +4,14 @@
 #include "Tools/record/VirtualKeys.h"
 
 // A field of the extension's header has a name that C++ reserves.
-#define explicit explicit_ // NOLINT(clang-diagnostic-keyword-macro)
+#ifdef __clang__
+#pragma clang diagnostic push
+#pragma clang diagnostic ignored "-Wkeyword-macro"
+#endif
+#define explicit explicit_
+#ifdef __clang__
+#pragma clang diagnostic pop
+#endif
 #include <xcb/xkb.h>
 #undef explicit
 #include <xkbcommon/xkbcommon-x11.h>
