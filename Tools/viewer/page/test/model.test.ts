@@ -126,17 +126,18 @@ test('markers are clicks, windows and slides', () => {
 });
 
 test('idle times are what the library tells', () => {
-  const stretches = idleIn({
+  const table: Table = {
     kind: 'idle',
-    time: Float64Array.of(1, 8),
-    columns: { end: Float64Array.of(6, 18.5) },
-  });
+    time: Float64Array.of(1, 8, 19),
+    columns: { end: Float64Array.of(6, 18.5, 1e9) },
+  };
+  const stretches = idleIn(table, 20);
   assert.deepEqual(stretches, [
     { start: 1, end: 6 },
     { start: 8, end: 18.5 },
   ]);
   assert.equal(idleTime(stretches), 15.5);
-  assert.deepEqual(idleIn(undefined), []);
+  assert.deepEqual(idleIn(undefined, 20), []);
 });
 
 test('the last region with an area is the recorded one, and the movie says how long it is', () => {

@@ -11,10 +11,14 @@ export interface Stretch {
 /// How many seconds without activity are shown as idle.
 export const shortestIdle = 3;
 
-/// Takes the idle times as the library tells them.
-export function idleIn(table: Table | undefined): Stretch[] {
+/// Takes the idle times as the library tells them, up to the end of the axis: a damaged time is not idleness.
+export function idleIn(table: Table | undefined, duration: number): Stretch[] {
   const track = table && new Track(table);
-  return Array.from(track?.times ?? [], (start, i) => ({ start, end: track!.number('end', i) }));
+  const stretches = Array.from(track?.times ?? [], (start, i) => ({
+    start,
+    end: Math.min(track!.number('end', i), duration),
+  }));
+  return stretches.filter(({ start, end }) => end - start >= shortestIdle);
 }
 
 /// How long the person was idle in all.

@@ -109,7 +109,7 @@ export class Session {
     this.appearances = appearancesIn(decoded.appearances);
     this.clicks = clicksIn(decoded.clicks);
     this.markers = markersOf(this).filter((time) => time >= 0 && time <= this.duration);
-    this.idle = idleIn(decoded.idle);
+    this.idle = idleIn(decoded.idle, this.duration);
     this.speed = speedOf(this.track('cursorLocation'));
   }
 
