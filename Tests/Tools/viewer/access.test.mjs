@@ -269,7 +269,7 @@ test('splitters tell their place, Escape closes the menu, keys move the lanes', 
   await page.locator('#layers-button').click();
   await page.locator('#play').focus();
   await page.keyboard.press('Escape');
-  assert.equal(await page.locator('#layers-menu').isVisible(), false);
+  await page.locator('#layers-menu').waitFor({ state: 'hidden' });
   for (let i = 0; i < 3; ++i) await page.keyboard.press('+');
   await page.keyboard.press('>');
   await page.keyboard.press('>');
@@ -293,7 +293,7 @@ test('units and words are those of the reader', async () => {
   assert.deepEqual(await page.locator('.legend').allInnerTexts(), ['x', 'y']);
   assert.equal(await page.locator('#heat-legend').isVisible(), false);
   await page.keyboard.press('7');
-  assert.ok(await page.locator('#heat-legend').isVisible());
+  await page.locator('#heat-legend').waitFor({ state: 'visible' });
   await page.getByRole('tab', { name: 'Facts' }).click();
   assert.match(await page.locator('#pane-facts').innerText(), /Memory\s+[\d.]+ GB/);
   assert.doesNotMatch(await page.locator('body').innerText(), /keystroke/i);
