@@ -119,9 +119,9 @@ private:
 
     ScreenPoint followed(const ScreenPoint& target, const ScreenPoint& cursor, const ScreenRect& area,
                          double factor) const {
-        const ScreenPoint near(pulledTo(cursor.x, target.x, area.width * options_.deadZone),
-                               pulledTo(cursor.y, target.y, area.height * options_.deadZone));
-        return detail::middleOf(zoomedArea(camera_.screen_, near, factor));
+        const ScreenPoint moved(pulledTo(cursor.x, target.x, area.width * options_.deadZone),
+                                pulledTo(cursor.y, target.y, area.height * options_.deadZone));
+        return detail::middleOf(zoomedArea(camera_.screen_, moved, factor));
     }
 
     Camera& camera_;
