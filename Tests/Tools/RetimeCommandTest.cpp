@@ -123,6 +123,7 @@ TEST_F(RetimeCommand, WantsToKnowWhatIsKept) {
     for (const std::string wrong : {"1", "1:2", "a-b", "1-2@", "1-2@fast", "1-2-3", "1e1-20", ""})
         EXPECT_EQ(retime({"--keep=" + wrong}).exitCode, 2) << wrong;
     EXPECT_EQ(retime({"--remove", "1-2@2"}).exitCode, 2);
+    EXPECT_EQ(retime({"--edits", "-"}, "-").exitCode, 2);
     EXPECT_EQ(runTool({"retime", recording, "--keep", "1-2", "-o", out}).exitCode, 2);
     EXPECT_EQ(runTool({"retime", recording, "--movie", edited, "--keep", "1-2"}).exitCode, 2);
     EXPECT_FALSE(std::filesystem::exists(out));
@@ -131,7 +132,10 @@ TEST_F(RetimeCommand, WantsToKnowWhatIsKept) {
 TEST_F(RetimeCommand, RefusesEditListsThatAreImpossible) {
     EXPECT_EQ(retime({"--keep", "2-1"}).exitCode, 1);
     EXPECT_EQ(retime({"--keep", "1-1"}).exitCode, 1);
+    EXPECT_EQ(retime({"--keep", "0-1", "--keep", "1-2@0"}).errors,
+              "zulm: --keep 1-2@0: speed is 0; it must be above 0\n");
     EXPECT_EQ(retime({"--keep", "1-2@0"}).exitCode, 1);
+    EXPECT_EQ(retime({"--remove", "2-1"}).errors, "zulm: --remove 2-1: end is 1, which is not after start, 2\n");
     EXPECT_EQ(retime({"--remove", "2-1"}).exitCode, 1);
     const std::string list =
         written("edits.json", R"({"schema": "zulm.edits", "schema_version": 1, "pieces": [{"at": 1}]})");

@@ -121,7 +121,7 @@ void addCutCommand(CLI::App& app, Action& chosen) {
     command->footer("zulm cut Recording.mp4 --keep 10-25 --keep 40-1:30@2 -o Cut.mp4\n"
                     "zulm cut Recording.mp4 --remove 5-12.5 --fast -o Cut.mp4");
     command->callback([options, &chosen] {
-        requireEdits(options->edits);
+        requireEdits(options->edits, options->recording);
         chosen = reporting("cut", options->json, {options->recording, options->output, options->edits.file},
                            [options](RunReport& report) { return cutOrEnd(*options, report); });
     });

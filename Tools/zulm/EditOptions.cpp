@@ -41,6 +41,16 @@ void addRanges(CLI::App& command, const std::string& name, std::vector<std::stri
         ->check(CLI::Validator(check, ""));
 }
 
+/// Returns what `read` returns. An impossible value becomes a failure that names its option.
+template <class Read>
+auto orFailure(const char* option, const std::string& text, Read read) {
+    try {
+        return read();
+    } catch (const Error& error) {
+        throw Failure(fmt::format("{} {}: {}", option, text, error.sentence()));
+    }
+}
+
 EditList readList(const EditOptions& options, const Recording& recording) {
     EditListOptions listOptions;
     listOptions.frameRate = options.frameRate;
@@ -63,7 +73,7 @@ EditList listWithout(const std::vector<std::string>& removed, const Recording& r
     std::vector<EditRange> ranges;
     ranges.reserve(removed.size());
     for (const std::string& text : removed)
-        ranges.push_back(parseEditRange(text));
+        ranges.push_back(orFailure("--remove", text, [&text] { return parseEditRange(text); }));
     return EditList::without(std::move(ranges), Rational::of(*duration));
 }
 
@@ -95,13 +105,15 @@ void addEditOptions(CLI::App& command, EditOptions& options) {
         ->needs("--edits");
 }
 
-void requireEdits(const EditOptions& options) {
+void requireEdits(const EditOptions& options, const std::string& recording) {
     const int given =
         (options.file.empty() ? 0 : 1) + (options.kept.empty() ? 0 : 1) + (options.removed.empty() ? 0 : 1);
     if (given == 0)
         throw CLI::RequiredError("either --edits FILE, --keep A-B or --remove A-B");
     if (given > 1)
         throw CLI::ValidationError("--edits, --keep and --remove cannot be given together");
+    if (options.file == "-" && recording == "-")
+        throw CLI::ValidationError("only one of RECORDING and --edits can be standard input");
 }
 
 EditList editsOf(const EditOptions& options, const Recording& recording) {
@@ -111,7 +123,7 @@ EditList editsOf(const EditOptions& options, const Recording& recording) {
         return listWithout(options.removed, recording);
     EditList edits;
     for (const std::string& piece : options.kept)
-        edits.keep(piece);
+        orFailure("--keep", piece, [&] { edits.keep(piece); });
     return edits;
 }
 

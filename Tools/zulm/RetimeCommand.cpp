@@ -149,7 +149,7 @@ void addRetimeCommand(CLI::App& app, Action& chosen) {
     command->footer("zulm retime Recording.mp4 --movie Cut.mp4 --keep 10-25 --keep 40-1:30@2 -o Whole.mp4\n"
                     "zulm retime Recording.mp4 --movie Cut.mp4 --edits Project.llc -o Whole.mp4");
     command->callback([options, &chosen] {
-        requireEdits(options->edits);
+        requireEdits(options->edits, options->recording);
         chosen = reporting("retime", options->json,
                            {options->recording, options->movie, options->output, options->edits.file},
                            [options](RunReport& report) { return retimeRecording(*options, report); });
