@@ -208,8 +208,8 @@ private:
         }
     }
 
-    /// Lists state the source out of an event with motion in two ways: where the source really ends, or as far from the
-    /// source in as the record out is from the record in.
+    /// Returns how many times as fast an event plays. In lists the source out of an event with motion has one of two
+    /// meanings: the real end of the source, or a time as far from the source in as the record out is from the record in.
     Rational speedOf(const CMXEvent& event) const {
         const Rational ratio(event.sourceLength(), event.recordLength());
         if (!event.motion) {
