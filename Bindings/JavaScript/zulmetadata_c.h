@@ -122,6 +122,10 @@ const double* zulm_entry_times(const ZulmEntries* entries); /* seconds */
 size_t zulm_column_count(const ZulmEntries* entries);
 const ZulmColumn* zulm_column(const ZulmEntries* entries, size_t index);
 
+/* Return sentences about what is missing in states, insights and retimed streams because of the file. */
+size_t zulm_warning_count(const ZulmEntries* entries);
+const char* zulm_warning(const ZulmEntries* entries, size_t index);
+
 /* What the tool prints as JSON: the file's object of `zulm info` and of `zulm verify`, and all that `zulm dump` prints.
    `kinds` is a list separated by commas, or null for every stream. */
 ZulmText* zulm_info(ZulmRecording* recording);

@@ -3,7 +3,6 @@
 // The tables that programs in other languages can ask for. The names of their columns are the same in all of them.
 
 #include "Bindings/Tables/Table.h"
-#include "ZULMetaDataSession/EditList.h"
 #include "ZULMetaDataSession/Recording.h"
 
 #include <functional>
@@ -15,7 +14,7 @@
 
 namespace ZULMetaData::Bindings {
 
-/// Returns what holds at each of these times. Nothing is known of a stream that cannot be decoded.
+/// Returns what holds at each of these times. Nothing is known of a stream that cannot be decoded, which is a warning.
 Table statesTable(const Recording& recording, std::span<const double> times, Interpolation interpolation);
 
 /// Parameters of insights by their names, such as {"idle_least", 3}.
@@ -27,7 +26,8 @@ Table insightTable(const Recording& recording, std::string_view name, const Insi
 
 std::vector<const char*> insightNames(); ///< in the order above
 
-/// One row for each stream of the edited recording, with its bytes. The times mean nothing.
-Table retimedTable(const Recording& recording, const EditList& edits);
+/// Returns one row for each stream of the edited recording, with its bytes. The times mean nothing. `edits` is a JSON
+/// document. Throws `Error` if it is not an edit list.
+Table retimedTable(const Recording& recording, const std::string& edits);
 
 } // namespace ZULMetaData::Bindings

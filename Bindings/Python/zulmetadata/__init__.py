@@ -154,7 +154,8 @@ class Recording(Mapping[Kind, _Records]):
 
         A number that is not known is not-a-number, and anything else None. Buttons and modifiers are names with "+"
         between two, such as "shift+ctrl". With "linear" the cursor moves between two entries, but rests while nothing
-        was recorded; with "none" it is where the last entry says.
+        was recorded; with "none" it is where the last entry says. A stream that cannot be decoded is a `UserWarning`,
+        and nothing is known of it.
         """
         if interpolate not in ("linear", "none"):
             raise ValueError(f"interpolate is 'linear' or 'none', not {interpolate!r}")
@@ -163,14 +164,16 @@ class Recording(Mapping[Kind, _Records]):
 
     def insights(self, name: str, **parameters: float) -> _Records:
         """Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path" or
-        "camera", with one record for each. Parameters change the defaults of the C++ library, by their names in lower
-        case with underscores, such as `least=3`. Another name raises a `ValueError`."""
+        "camera". `dtype.names` of the result lists the fields. Parameters change the defaults of the C++ library, by
+        their names in lower case with underscores, such as `least=3`. Another name raises a `ValueError`. A stream that
+        cannot be decoded is a `UserWarning`."""
         return _table_of(self._opened().insight(name, {key: float(value) for key, value in parameters.items()}))
 
     def retime(self, edits: str | Mapping[str, Any]) -> _Records:
         """Returns the streams for a movie that was cut by an edit list: the JSON document, or the mapping that it
         describes. A record has the `kind` and all `bytes` of a stream. If `is_copied` is 0, `moved`, `carried`,
-        `added` and `left_out` count its entries. An impossible list raises a `ValueError`."""
+        `added` and `left_out` count its entries. An impossible list raises a `ValueError`. What a `UserWarning` says is
+        not in the result: hidden streams, and what follows damage."""
         document = edits if isinstance(edits, str) else json.dumps(edits)
         return _table_of(self._opened().retimed(document))[
             ["kind", "bytes", "is_copied", "moved", "carried", "added", "left_out"]
