@@ -56,14 +56,6 @@ protected:
         return runTool(arguments);
     }
 
-    std::vector<std::string> namesInFolder() const {
-        std::vector<std::string> names;
-        for (const auto& entry : std::filesystem::directory_iterator(folder.path()))
-            names.push_back(entry.path().filename());
-        std::sort(names.begin(), names.end());
-        return names;
-    }
-
     TemporaryFolder folder;
     const std::string recording = folder / "Recording.mp4";
     const std::string edited = folder / "Edited.mp4";
@@ -81,7 +73,7 @@ TEST_F(RetimeCommand, WritesACopyWithTheMetaDataAtItsNewTimes) {
     EXPECT_EQ(contentsOf(out), tinyMovie(6000) + zulmAtom({actions({{1, 1}, {2, 2}, {2, 1}, {2.5, 2}}),
                                                            points({{1, 1}, {2.5, 5}, {6, 12}}), region}));
     EXPECT_EQ(contentsOf(edited), tinyMovie(6000));
-    EXPECT_THAT(namesInFolder(), ElementsAre("Edited.mp4", "Out.mp4", "Recording.mp4"));
+    EXPECT_THAT(namesIn(folder.path()), ElementsAre("Edited.mp4", "Out.mp4", "Recording.mp4"));
 }
 
 TEST_F(RetimeCommand, KeepsThePiecesInTheOrderGiven) {
@@ -153,7 +145,7 @@ TEST_F(RetimeCommand, RefusesAnEditedMovieWithMetaDataUnlessItReplacesThat) {
     EXPECT_EQ(refused.exitCode, 1);
     EXPECT_THAT(refused.errors,
                 HasSubstr(edited + ": has metadata already: topmostAppName, cursorLocation; --replace"));
-    EXPECT_THAT(namesInFolder(), ElementsAre("Edited.mp4", "Recording.mp4"));
+    EXPECT_THAT(namesIn(folder.path()), ElementsAre("Edited.mp4", "Recording.mp4"));
     EXPECT_EQ(retime({"--keep", "0-10", "--replace"}).exitCode, 0);
     EXPECT_EQ(contentsOf(out),
               tinyMovie(6000) + creator + zulmAtom({actions({{1, 1}, {5, 2}}), points({{1, 1}, {5, 5}}), region}));
@@ -236,7 +228,7 @@ TEST_F(RetimeCommand, RefusesWhatIsNoMovie) {
     EXPECT_EQ(retime({"--keep", "0-10"}).exitCode, 1);
     writeFile(edited, "no movie at all");
     EXPECT_EQ(retime({"--keep", "0-10"}).exitCode, 1);
-    EXPECT_THAT(namesInFolder(), ElementsAre("Edited.mp4", "Recording.mp4"));
+    EXPECT_THAT(namesIn(folder.path()), ElementsAre("Edited.mp4", "Recording.mp4"));
 }
 
 TEST_F(RetimeCommand, ReplacesNoFileUnlessItIsForced) {
