@@ -112,7 +112,7 @@ void addCutCommand(CLI::App& app, Action& chosen) {
     command->add_option("-o,--output", options->output, "Write the new movie to this file")
         ->type_name("OUT")
         ->required();
-    command->add_flag("--force", options->force, "Replace OUT where it exists");
+    command->add_flag("--force", options->force, "Replace OUT if it exists");
     command->add_flag_callback(
         "--fast", [options] { options->mode = CutMode::Fast; },
         "Copy the pictures instead of encoding them again. Every piece then begins at the last key frame before it; "

@@ -83,12 +83,13 @@ void addEditOptions(CLI::App& command, EditOptions& options) {
     command
         .add_option("--edits", options.file,
                     "Read the pieces from this edit list: JSON of zulm, an ffmpeg concat list, LosslessCut, "
-                    "auto-editor, OpenTimelineIO, CMX 3600, or a movie's own list")
+                    "auto-editor, OpenTimelineIO, CMX 3600, or a movie's own list; - is standard input")
         ->type_name("FILE");
-    addRanges(command, "--keep", options.kept, "A-B[@SPEED]",
-              "Keep the recording from A to B, so many times as fast (repeatable; pieces follow one another in the "
-              "order given)",
-              checkKept);
+    addRanges(
+        command, "--keep", options.kept, "A-B[@SPEED]",
+        "Keep the recording from A to B, which are seconds (12.5, 61/3) or time codes (1:30), SPEED times as fast "
+        "(repeatable; pieces follow one another in the order given)",
+        checkKept);
     addRanges(command, "--remove", options.removed, "A-B", "Keep all but what lies from A to B (repeatable)",
               checkRemoved);
     command
@@ -100,7 +101,7 @@ void addEditOptions(CLI::App& command, EditOptions& options) {
                     throw CLI::ValidationError(
                         "--frame-rate", fmt::format("'{}' is no frame rate such as 25, 29.97 or 30000/1001", word));
             },
-            "Frames for each second in an edit list that counts frames")
+            "The frame rate of an edit list that counts frames, such as 25 or 30000/1001")
         ->type_name("RATE")
         ->needs("--edits");
 }

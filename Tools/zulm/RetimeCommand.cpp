@@ -142,7 +142,7 @@ void addRetimeCommand(CLI::App& app, Action& chosen) {
     command->add_option("-o,--output", options->output, "Write a copy of EDITED with the metadata to this file")
         ->type_name("OUT")
         ->required();
-    command->add_flag("--force", options->force, "Replace OUT where it exists");
+    command->add_flag("--force", options->force, "Replace OUT if it exists");
     command->add_flag("--replace", options->replace, "Leave out the metadata that EDITED has, except who made it");
     addFragmentIndexOption(*command, options->index);
     command->add_flag("--json", options->json, "Print one JSON document");

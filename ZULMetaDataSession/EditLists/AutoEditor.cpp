@@ -62,7 +62,7 @@ private:
         } else if (options_.frameRate) {
             frameRate_ = *options_.frameRate;
         } else {
-            list_.fail("it counts frames, and the frame rate is not known; name it");
+            list_.fail("it counts frames; name its frame rate");
         }
     }
 
