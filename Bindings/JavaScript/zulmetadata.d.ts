@@ -140,10 +140,13 @@ export class Recording {
     parameters?: Record<string, number | boolean>,
   ): Table;
   /**
-   * Returns the streams for a movie that was cut by an edit list: the JSON document, or the object that it describes.
-   * Throws a `ZulmError` for a list that cannot be.
+   * Returns the streams for a movie that was cut by an edit list: the text of a list, or the object that a JSON
+   * document describes. Lists of other programs are read, too. Throws a `ZulmError` for a list that cannot be.
+   *
+   * @param options `name` is the file of the list; its extension says the form if the text does not. `frameRate`, such
+   * as 25 or "30000/1001", is for lists that count frames.
    */
-  retime(edits: string | object): RetimedStream[];
+  retime(edits: string | object, options?: { name?: string; frameRate?: number | string }): RetimedStream[];
   /** Returns the file's object of `zulm info --json`. */
   info(): object;
   /** Returns the file's object of `zulm verify --json`, in which images are known by the size that they state. */

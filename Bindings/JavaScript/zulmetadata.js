@@ -311,10 +311,16 @@ export class Recording {
     );
   }
 
-  retime(edits) {
+  retime(edits, { name = 'edits', frameRate = '' } = {}) {
     const text = typeof edits === 'string' ? edits : JSON.stringify(edits);
     const { columns } = this.#computed((core) =>
-      core.withText(text, (place) => core.takeTable(core.call('zulm_retime', this.#handle, place), 'retimed')),
+      core.withText(text, (textPlace) =>
+        core.withText(name, (namePlace) =>
+          core.withText(frameRate, (ratePlace) =>
+            core.takeTable(core.call('zulm_retime', this.#handle, textPlace, namePlace, ratePlace), 'retimed'),
+          ),
+        ),
+      ),
     );
     return columns.kind.map((kind, row) => ({
       kind,

@@ -289,8 +289,11 @@ ZulmEntries* zulm_insight(ZulmRecording* recording, const char* name, const char
     return orNull([&] { return entriesOf(insightTable(recording->session(), name, parametersIn(parameters))); });
 }
 
-ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits) {
-    return orNull([&] { return entriesOf(retimedTable(recording->session(), edits)); });
+ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits, const char* name, const char* frameRate) {
+    return orNull([&] {
+        return entriesOf(
+            retimedTable(recording->session(), {edits, name ? name : "edits", frameRate ? frameRate : ""}));
+    });
 }
 
 void zulm_free_entries(ZulmEntries* entries) {

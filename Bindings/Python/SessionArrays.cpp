@@ -107,10 +107,12 @@ void addSession(py::module_& module) {
             py::arg("name"), py::arg("parameters"))
         .def(
             "retimed",
-            [](const Recording& recording, const std::string& edits) {
-                return computed(recording, [&] { return retimedTable(recording, edits); });
+            [](const Recording& recording, const py::bytes& edits, const FileLocation& name,
+               const std::string& frameRate) {
+                const EditText list{edits, utf8Path(name), frameRate};
+                return computed(recording, [&] { return retimedTable(recording, list); });
             },
-            py::arg("edits"));
+            py::arg("edits"), py::arg("name"), py::arg("frame_rate"));
     module.attr("insight_names") = py::tuple(py::cast(insightNames()));
 }
 

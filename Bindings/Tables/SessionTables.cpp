@@ -370,6 +370,18 @@ auto warningOf(std::vector<std::string>& warnings) {
     return [&warnings](const Error& error) { warnings.push_back(error.sentence()); };
 }
 
+EditList listIn(const EditText& edits, const Recording& recording) {
+    EditListOptions options;
+    if (const std::optional<double> duration = recording.duration())
+        options.duration = Rational::of(*duration);
+    if (!edits.frameRate.empty()) {
+        options.frameRate = Rational::parse(edits.frameRate);
+        if (!options.frameRate || options.frameRate->isZero())
+            throw std::invalid_argument(edits.frameRate + " is no frame rate such as 25, 29.97 or 30000/1001");
+    }
+    return EditList::open(ByteSource::memory(edits.text), edits.name, options);
+}
+
 } // namespace
 
 Table statesTable(const Recording& recording, std::span<const double> times, Interpolation interpolation) {
@@ -404,8 +416,8 @@ Table insightTable(const Recording& recording, std::string_view name, const Insi
     throw std::invalid_argument("there are no insights " + std::string(name));
 }
 
-Table retimedTable(const Recording& recording, const std::string& edits) {
-    EditedRecording edited = retimed(recording, EditList::read(edits, "edits"));
+Table retimedTable(const Recording& recording, const EditText& edits) {
+    EditedRecording edited = retimed(recording, listIn(edits, recording));
     const std::vector<EditedStream>& streams = edited.streams;
     const auto count = [](std::uint64_t number) { return static_cast<double>(number); };
     Table table;

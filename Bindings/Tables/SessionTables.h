@@ -26,8 +26,15 @@ Table insightTable(const Recording& recording, std::string_view name, const Insi
 
 std::vector<const char*> insightNames(); ///< in the order above
 
-/// Returns one row for each stream of the edited recording, with its bytes. The times mean nothing. `edits` is a JSON
-/// document. Throws `Error` if it is not an edit list.
-Table retimedTable(const Recording& recording, const std::string& edits);
+/// The text of an edit list, in any form that `EditList::open` reads.
+struct EditText {
+    std::string text;
+    std::string name = "edits"; ///< what errors call it; its extension says the form if the text does not
+    std::string frameRate = {}; ///< such as "30000/1001", for lists that count frames; may be empty
+};
+
+/// Returns one row for each stream of the edited recording, with its bytes. The times mean nothing. Throws `Error` if
+/// the text is not an edit list.
+Table retimedTable(const Recording& recording, const EditText& edits);
 
 } // namespace ZULMetaData::Bindings

@@ -70,6 +70,14 @@ test('takes one time, and stays open after a wrong argument', () => {
   assert.equal(recording.at([1, 2]).time.length, 2);
 });
 
+test('reads edit lists of other programs', () => {
+  const streams = recording.retime({ ...edits, pieces: [{ start: '1', end: '3' }] });
+  assert.deepEqual(recording.retime('1,3\n', { name: 'cuts.csv' }), streams);
+  const decisions = '001  AX V C 00:00:01:00 00:00:03:00 00:00:00:00 00:00:02:00\n';
+  assert.deepEqual(recording.retime(decisions, { name: 'cuts.edl', frameRate: 25 }), streams);
+  assert.throws(() => recording.retime(decisions, { name: 'cuts.edl' }), { message: /^cuts\.edl: / });
+});
+
 test('warns of what is missing', async () => {
   const damaged = await Recording.open(bytesOf(movie).subarray(0, -100), 'Torn.mp4');
   const warnings = [];
