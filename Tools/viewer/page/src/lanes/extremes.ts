@@ -16,7 +16,8 @@ export class Extremes {
     }
   }
 
-  /// Of the values from `first` up to, without, `end`; infinite where there are none.
+  /// Returns the least and the greatest of the values from `first` up to, but not including, `end`. If there are none,
+  /// both are infinite.
   of(first: number, end: number): [number, number] {
     let [least, greatest] = [Infinity, -Infinity];
     const take = (node: number) => {
