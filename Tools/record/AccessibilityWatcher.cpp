@@ -17,8 +17,8 @@ namespace Recorder {
 namespace {
 
 constexpr int s_callTimeout = 400;   ///< milliseconds of one call
+constexpr int s_deepest = 64;        ///< objects that are in each other
 constexpr int s_visitedAtMost = 600; ///< objects, in search of the focus
-constexpr int s_deepest = 32;        ///< objects within each other, below the pointer
 
 struct ObjectDeleter {
     void operator()(void* object) const { g_object_unref(object); }
@@ -38,6 +38,7 @@ private:
     void obey(const std::string& line);
     void say(const std::string& line);
     void answerHover(int x, int y);
+    static Object<AtspiAccessible> innermostAt(AtspiAccessible* outer, int x, int y);
     Object<AtspiAccessible> applicationOf(std::uint32_t process);
     Object<AtspiAccessible> activeWindowOf(AtspiAccessible* application);
     Object<AtspiAccessible> focusIn(AtspiAccessible* accessible, int& visits);
@@ -203,40 +204,34 @@ const char* Watcher::currentFocus() {
     return focus_ ? kindOf(focus_.get()) : nullptr;
 }
 
-/// Returns the rectangle of an object if the position is in it.
-std::optional<Area> areaAround(AtspiComponent* component, int x, int y) {
-    AtspiRect* told = atspi_component_get_extents(component, ATSPI_COORD_TYPE_SCREEN, nullptr);
-    const Area area = told ? Area{told->x, told->y, told->width, told->height} : Area();
-    g_free(told);
-    return area.contains({x, y}) ? std::optional(area) : std::nullopt;
-}
-
-/// Asks each object for the one within it, because some applications tell an object's child and not its innermost part.
-std::optional<Area> innermostAreaAt(AtspiAccessible* window, int x, int y) {
-    std::optional<Area> area;
-    Object<AtspiComponent> component(atspi_accessible_get_component_iface(window));
-    for (int depth = 0; component && depth < s_deepest; ++depth) {
-        const Object<AtspiAccessible> inner(
-            atspi_component_get_accessible_at_point(component.get(), x, y, ATSPI_COORD_TYPE_SCREEN, nullptr));
-        if (!inner || static_cast<void*>(inner.get()) == component.get()) // both are faces of one object
+/// Some applications answer with the innermost object, others with the child that it is in.
+Object<AtspiAccessible> Watcher::innermostAt(AtspiAccessible* outer, int x, int y) {
+    Object<AtspiAccessible> found;
+    for (int depth = 0; depth < s_deepest; ++depth) {
+        AtspiAccessible* around = found ? found.get() : outer;
+        const Object<AtspiComponent> component(atspi_accessible_get_component_iface(around));
+        Object<AtspiAccessible> next(
+            component ? atspi_component_get_accessible_at_point(component.get(), x, y, ATSPI_COORD_TYPE_SCREEN, nullptr)
+                      : nullptr);
+        if (!next || next.get() == around)
             break;
-        component.reset(atspi_accessible_get_component_iface(inner.get()));
-        const std::optional<Area> found = component ? areaAround(component.get(), x, y) : std::nullopt;
-        if (!found)
-            break;
-        area = found;
+        found = std::move(next);
     }
-    return area;
+    return found;
 }
 
 void Watcher::answerHover(int x, int y) {
     const Object<AtspiAccessible> application = process_ ? applicationOf(process_) : nullptr;
     const Object<AtspiAccessible> window = application ? activeWindowOf(application.get()) : nullptr;
-    const std::optional<Area> area = window ? innermostAreaAt(window.get(), x, y) : std::nullopt;
+    const Object<AtspiAccessible> found = window ? innermostAt(window.get(), x, y) : nullptr;
+    const Object<AtspiComponent> inner(found ? atspi_accessible_get_component_iface(found.get()) : nullptr);
+    AtspiRect* area = inner ? atspi_component_get_extents(inner.get(), ATSPI_COORD_TYPE_SCREEN, nullptr) : nullptr;
     std::ostringstream line;
     line << "rect";
-    if (area)
+    const bool isIn = area && x >= area->x && y >= area->y && x < area->x + area->width && y < area->y + area->height;
+    if (isIn)
         line << ' ' << area->x << ' ' << area->y << ' ' << area->width << ' ' << area->height;
+    g_free(area);
     say(line.str());
 }
 
