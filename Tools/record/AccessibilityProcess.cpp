@@ -162,11 +162,12 @@ void AccessibilityProcess::ask() {
     send("ask\n");
 }
 
-void AccessibilityProcess::askHover(Position pointer) {
+bool AccessibilityProcess::askHover(Position pointer) {
     if (isHovering_ || !isAlive())
-        return;
+        return false;
     isHovering_ = true;
     send(fmt::format("hover {} {}\n", pointer.x, pointer.y));
+    return true;
 }
 
 } // namespace Recorder

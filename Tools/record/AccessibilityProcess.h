@@ -47,8 +47,8 @@ public:
     /// Asks for the focus of the window on top, unless such a question waits for its answer.
     void ask();
 
-    /// Asks what the pointer hovers over, unless such a question waits for its answer.
-    void askHover(Position pointer);
+    /// Asks what the pointer hovers over. Returns false if such a question waits for its answer.
+    bool askHover(Position pointer);
 
 private:
     bool readLines(const std::function<void(const std::string&)>& take);

@@ -314,10 +314,11 @@ void RecorderLoop::hover() {
     const std::optional<Position> pointer = observers_->pointer.position();
     if (!pointer || pointer == hovered_)
         return;
+    const bool asks = accessibility_ && observers_->windows.process() != 0;
+    if (asks && !accessibility_->askHover(*pointer))
+        return; // until the earlier question is answered, even if the pointer rests from now on
     hovered_ = pointer;
-    if (accessibility_ && observers_->windows.process() != 0)
-        accessibility_->askHover(*pointer);
-    else
+    if (!asks)
         observers_->windows.hover(now(), *pointer);
 }
 

@@ -36,7 +36,10 @@ class Desk:
         self.start(["Xvfb", "-displayfd", str(write), "-screen", "0", size, "-nolisten", "tcp", "-noreset"], pass_fds=[write])
         os.close(write)
         with os.fdopen(read) as numbers:
-            self.display = ":" + numbers.readline().strip()
+            number = numbers.readline().strip()
+        if not number:
+            raise OSError("Xvfb has ended at once")
+        self.display = f":{number}"
         self.environment["DISPLAY"] = self.display
         if layout:
             self.run("setxkbmap", *layout)
