@@ -299,6 +299,7 @@ void RecorderLoop::takeMail() {
 void RecorderLoop::began(Instant zero) {
     zero_ = zero;
     journal_->start(zero);
+    disk_ = std::make_unique<DiskSync>(folder_.folder());
     journal_->note<CursorActionKind>(zero, s_noButtonYet);
     if (options_.duration)
         camera_->stopAt(endOfDuration());
@@ -363,6 +364,8 @@ void RecorderLoop::takeSignals() {
         if (signal->number == SIGUSR1) {
             obey(pausedAt_ ? Command::Resume : Command::Pause);
         } else {
+            if (end_ == End::Signal)
+                StopSignals::endAtOnce(signal->number, folder_.folder());
             const Instant instant = now();
             if (signal->isFromTerminal)
                 input_->dropInterruptKey();
@@ -488,6 +491,7 @@ bool RecorderLoop::save() {
         }
     };
     sound_.reset();
+    disk_.reset();
     attempt([this] { camera_->finish(endInstant_); });
     takeMail();
     input_->releaseAll(endInstant_);

@@ -75,7 +75,7 @@ void SoundSource::record(const Camera& camera, VideoWriter& writer) {
 
 /// Fills gaps with silence and leaves out what comes twice, so that sound and picture never drift apart.
 void SoundSource::write(VideoWriter& writer, Instant inMovie) {
-    const std::int64_t target = inMovie * s_soundRate / s_second;
+    const std::int64_t target = inUnits(inMovie, s_soundRate);
     if (written_ > target + s_tolerance)
         return;
     if (written_ == 0 || written_ < target - s_tolerance) {

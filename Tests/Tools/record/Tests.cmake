@@ -12,7 +12,7 @@ else()
   set(record_programs "")
 endif()
 # Each suite of the script is a test. They are skipped where the recorder is not built or no X server can be started.
-foreach(suite IN ITEMS Files Picture Pointer Keys Windows Control Loss Privacy)
+foreach(suite IN ITEMS Files Picture Sound Pointer Keys Windows Control Loss Privacy)
   add_test(NAME Tools/record/${suite} COMMAND ${PYTHON3} ${record_tests}/test_recorder.py ${suite})
   set_tests_properties(Tools/record/${suite} PROPERTIES ENVIRONMENT "${record_programs}" SKIP_RETURN_CODE 77
     TIMEOUT 600)
