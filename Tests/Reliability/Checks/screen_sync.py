@@ -10,6 +10,7 @@ import time
 from check import Result
 
 ONE_FRAME = 1 / 60
+SHARED = 3  # times as late the median may be in the quick form, which shares its machine with others
 
 
 def use_desk(context):
@@ -106,16 +107,13 @@ def run(context):
     result.cases = events
     result.lost = events - min(len(told), len(found))
     own = [(when, late - delay) for (when, late), delay in zip(found, delays)]
-    if os.environ.get("ZULM_SYNC_POINTS"):
-        with open(os.environ["ZULM_SYNC_POINTS"], "w") as f:
-            for (when, late), delay in zip(found, delays): print(when, late, delay, file=f)
     result.notes.append(f"{report['frames']} frames in {report['duration']:.0f} s, {report['dropped']} dropped")
     result.notes.append("| picture after its entry | median | 99th percentile | largest | drift in a minute |")
     for name, points in (("as recorded", found), ("less what the window took to draw it", own)):
         result.notes.append(f"| {name} | " + " | ".join(f"{value:.2f} ms" for value in figures(points)) + " |")
     median, most, _, drift = figures(own)
-    if abs(median) >= 1000 * ONE_FRAME:
-        result.failures.append(f"the median, {median:.1f} ms, is not below one frame at 60 fps")
-    if context.full and (most >= 2000 * ONE_FRAME or abs(drift) >= 1):  # the quick form shares its machine
+    if abs(median) >= 1000 * ONE_FRAME * (1 if context.full else SHARED):
+        result.failures.append(f"the median is {median:.1f} ms")
+    if context.full and (most >= 2000 * ONE_FRAME or abs(drift) >= 1):
         result.failures.append(f"99th percentile {most:.1f} ms, drift {drift:.2f} ms a minute")
     return result
