@@ -24,8 +24,9 @@ constexpr std::uint32_t s_moov = boxType("moov");
 constexpr std::uint32_t s_moof = boxType("moof");
 constexpr std::uint32_t s_free = boxType("free");
 constexpr std::uint64_t s_largestIndex = std::uint64_t{64} << 20;
-constexpr std::uint32_t s_longestRun = 1 << 16; ///< samples whose sizes are not told one by one
-constexpr std::uint32_t s_primingOfAAC = 1024;  ///< samples that the encoder puts before the sound
+constexpr std::uint64_t s_longestMovie = 1'000'000'000; ///< seconds, so that no product of times overflows
+constexpr std::uint32_t s_longestRun = 1 << 16;         ///< samples whose sizes are not told one by one
+constexpr std::uint32_t s_primingOfAAC = 1024;          ///< samples that the encoder puts before the sound
 
 bool readAt(int file, std::uint64_t offset, std::span<std::uint8_t> bytes) {
     std::size_t done = 0;
@@ -75,11 +76,12 @@ std::optional<FileBox> boxAt(int file, std::uint64_t offset, std::uint64_t end) 
     return box;
 }
 
-/// What an atom was before it became free space: the first atom in it tells.
-std::uint32_t formerType(const FileBox& box, const Bytes& bytes) {
-    if (box.type != s_free || bytes.size() < 16)
+/// Indexes are told by the first atom in them, also after they became free space.
+std::uint32_t typeOf(const FileBox& box, const Bytes& bytes) {
+    if (box.type != s_moov && box.type != s_moof && box.type != s_free)
         return box.type;
-    const std::uint32_t first = BoxReader(std::span(bytes).subspan(12)).u32();
+    constexpr std::size_t innerType = 12;
+    const std::uint32_t first = bytes.size() < 16 ? 0 : BoxReader(std::span(bytes).subspan(innerType)).u32();
     return first == boxType("mvhd") ? s_moov : first == boxType("mfhd") ? s_moof : s_free;
 }
 
@@ -124,7 +126,7 @@ FragmentedMovie::FragmentedMovie(int file, const std::string& name) : name_(name
             if (!readAt(file, offset, bytes))
                 break;
         }
-        const std::uint32_t type = formerType(*box, bytes);
+        const std::uint32_t type = typeOf(*box, bytes);
         if (type == s_moov && movie_.empty()) {
             readMovieBox(std::move(bytes));
             hidden_.push_back(offset);
@@ -213,7 +215,7 @@ bool FragmentedMovie::readTrackFragment(const Box& box, std::uint64_t fragmentOf
     BoxReader start(childOf(box, boxType("tfdt")).payload);
     const bool isWide = start.u32() >> 24 == 1;
     usual.time = isWide ? start.u64() : start.u32();
-    if (!header.isWhole() || !start.isWhole())
+    if (!header.isWhole() || !start.isWhole() || usual.time > s_longestMovie * track->timescale)
         return false;
     for (const Box& run : boxesIn(box.payload)) {
         if (run.type != boxType("trun"))
@@ -232,9 +234,10 @@ bool FragmentedMovie::readRun(const Box& box, std::uint64_t base, std::uint32_t 
     BoxReader reader(box.payload);
     const std::uint32_t has = reader.u32();
     const std::uint32_t count = reader.u32();
-    run.chunk.offset = base;
-    if ((has & 0x1) != 0)
-        run.chunk.offset += static_cast<std::uint64_t>(std::int64_t{reader.i32()});
+    const std::int64_t distance = (has & 0x1) != 0 ? reader.i32() : 0;
+    if (base > media.end || static_cast<std::int64_t>(base) + distance < 0)
+        return false;
+    run.chunk.offset = static_cast<std::uint64_t>(static_cast<std::int64_t>(base) + distance);
     const std::uint32_t firstFlags = (has & 0x4) != 0 ? reader.u32() : usualFlags;
     const bool tellsSizes = (has & 0x200) != 0;
     if (run.chunk.offset < media.begin || run.chunk.offset > media.end || (!tellsSizes && count > s_longestRun))
@@ -253,6 +256,8 @@ bool FragmentedMovie::readRun(const Box& box, std::uint64_t base, std::uint32_t 
         if (!reader.isWhole() || sample.size == 0 || run.bytes > media.end - run.chunk.offset)
             return false;
         usual.time += sample.duration;
+        if (usual.time > s_longestMovie * run.track->timescale)
+            return false;
         run.samples.push_back(sample);
         ++run.chunk.samples;
     }
@@ -278,7 +283,8 @@ double FragmentedMovie::duration() const {
 }
 
 std::uint64_t FragmentedMovie::inMovieTime(const Track& track, std::uint64_t duration) const {
-    return (duration * timescale_ + track.timescale / 2) / track.timescale;
+    return duration / track.timescale * timescale_ +
+           (duration % track.timescale * timescale_ + track.timescale / 2) / track.timescale;
 }
 
 void FragmentedMovie::makeOrdinary(int file) const {

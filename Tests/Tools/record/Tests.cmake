@@ -8,6 +8,11 @@ if(ZULMETADATA_RECORDER)
   zulm_project_options(ShownWindow)
   set_target_properties(ShownWindow PROPERTIES RUNTIME_OUTPUT_DIRECTORY ${CMAKE_CURRENT_BINARY_DIR})
   set(record_programs ZULM_RECORD=$<TARGET_FILE:zulm-record> SHOWN_WINDOW=$<TARGET_FILE:ShownWindow> ZULM=${ZULM_PATH})
+
+  zulm_add_tests(RecorderTests FragmentedMovieTest InstantTest ScrollAxisTest)
+  target_sources(RecorderTests PRIVATE
+    ${PROJECT_SOURCE_DIR}/Tools/record/Boxes.cpp ${PROJECT_SOURCE_DIR}/Tools/record/FragmentedMovie.cpp)
+  target_link_libraries(RecorderTests PRIVATE ${ZULMETADATA_FMT_TARGET})
 else()
   set(record_programs "")
 endif()
