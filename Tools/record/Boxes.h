@@ -101,8 +101,8 @@ public:
 
 private:
     void number(std::uint64_t value, std::size_t size) {
-        for (std::size_t i = size; i-- > 0;)
-            bytes_.push_back(static_cast<std::uint8_t>(value >> (8 * i)));
+        for (std::size_t i = 1; i <= size; ++i)
+            bytes_.push_back(static_cast<std::uint8_t>(value >> (8 * (size - i))));
     }
     void setU32(std::size_t position, std::uint32_t value) {
         for (std::size_t i = 0; i < 4; ++i)

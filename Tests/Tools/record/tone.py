@@ -26,7 +26,7 @@ def main():
     any_size = 2**32 - 1
     float32 = 5
     error = ctypes.c_int()
-    buffer = Buffer(any_size, 4 * BLOCK * 8, any_size, any_size, any_size)  # 80 ms
+    buffer = Buffer(any_size, 4 * BLOCK * 25, any_size, any_size, any_size)  # 250 ms
     stream = ctypes.c_void_p(pulse.pa_simple_new(None, b"tone", 1, None, b"tone", ctypes.byref(Sample(float32, RATE, 1)),
                                                  None, ctypes.byref(buffer), ctypes.byref(error)))
     if not stream:
