@@ -1,7 +1,7 @@
 // The page: a recording, a player, and everything that shows where they are.
 
 import { Decoder } from './decoder/client';
-import { embeddedRecording, type EmbeddedRecording } from './decoder/embedded';
+import { embeddedRecording, type EmbeddedRecording, type PackedText } from './decoder/embedded';
 import { EntriesPane } from './entries/pane';
 import { showCheck, showFacts } from './facts/pane';
 import { Timeline } from './lanes/timeline';
@@ -116,7 +116,7 @@ export class App implements Page {
   }
 
   /// What is open stays where the new one cannot be read.
-  private async open(source: Blob | string, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
+  private async open(source: Blob | PackedText, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
     const opening = ++this.opened;
     document.body.classList.add('is-busy');
     setText(byId('welcome-title'), `Opening ${shown(name)}…`);

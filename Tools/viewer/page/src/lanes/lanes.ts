@@ -3,12 +3,12 @@
 import { clickLabel, type Click } from '../model/clicks';
 import { StreamRows } from '../entries/rows';
 import { brief, titleOf } from '../model/format';
+import { Extremes } from '../model/extremes';
 import { keyCap } from '../model/keys';
 import type { Rect } from '../model/geometry';
 import { countBefore, countUntil, lastAt } from '../model/search';
 import { rectAt, type HiddenStream, type Session } from '../model/session';
 import type { Track } from '../model/track';
-import { Extremes } from './extremes';
 import { drawArea, drawBands, drawDensity, drawLine, type Curve, type Lane, type LaneCanvas } from './lane';
 
 export interface LaneOptions {
@@ -251,7 +251,9 @@ function valuesOf(track: Track, value: (index: number) => number): Float32Array 
 /// Without the few that would flatten everything else.
 function usualGreatest(values: Float32Array): number {
   const step = Math.max(1, Math.floor(values.length / 20000));
-  const some = values.filter((_, i) => i % step === 0 && values[i]! > 0).sort();
+  const some = Float32Array.from({ length: Math.ceil(values.length / step) }, (_, i) => values[i * step]!)
+    .filter((value) => value > 0)
+    .sort();
   return some.length > 0 ? some[Math.floor(some.length * 0.995)]! : 1;
 }
 
@@ -306,8 +308,7 @@ function drawScroll(canvas: LaneCanvas, times: Float64Array, extremes: Extremes,
 function speedLane(session: Session): Lane | undefined {
   if (!filled(session, 'cursorLocation')) return undefined;
   const { times, values } = session.speed;
-  const extremes = new Extremes(values.map(Math.sqrt));
-  const curve = { times, extremes, low: 0, high: Math.sqrt(usualGreatest(values)) };
+  const curve = { times, extremes: session.speedExtremes, low: 0, high: usualGreatest(values), shape: Math.sqrt };
   return {
     title: 'Cursor speed',
     height: 30,
@@ -326,8 +327,7 @@ function curveOf(track: Track, values: Float32Array, low: number, high: number):
 function trailLane(session: Session, { region }: LaneOptions): Lane | undefined {
   const track = filled(session, 'cursorLocation');
   if (!track) return undefined;
-  const xs = new Extremes(valuesOf(track, (i) => track.number('x', i)));
-  const ys = new Extremes(valuesOf(track, (i) => -track.number('y', i)));
+  const [xs, ys] = [session.positionExtremes('x'), session.positionExtremes('y')];
   return {
     title: 'Cursor',
     legend: [
@@ -339,7 +339,7 @@ function trailLane(session: Session, { region }: LaneOptions): Lane | undefined 
       const { x, y, width, height } = region();
       const { times } = track;
       drawLine(canvas, { times, extremes: xs, low: x, high: x + width }, canvas.palette.accent);
-      drawLine(canvas, { times, extremes: ys, low: -(y + height), high: -y }, canvas.palette.second);
+      drawLine(canvas, { times, extremes: ys, low: y + height, high: y }, canvas.palette.second);
     },
     valueAt: (time) => {
       const index = track.at(time);
@@ -348,20 +348,22 @@ function trailLane(session: Session, { region }: LaneOptions): Lane | undefined 
   };
 }
 
+/// The entries whose values are not those of the entry before.
+function changesOf(track: Track, names: string[]): number[] {
+  const columns = names.map((name) => track.values(name));
+  const changes: number[] = [];
+  for (let i = 0; i < track.count; ++i)
+    if (i === 0 || columns.some((values) => values[i] !== values[i - 1])) changes.push(i);
+  return changes;
+}
+
 /// Rectangles that stay the same are one.
 function hoverLane(session: Session): Lane | undefined {
   const track = filled(session, 'hoverRect');
   if (!track) return undefined;
-  const starts: number[] = [];
-  const texts: string[] = [];
-  let last = '';
-  for (let i = 0; i < track.count; ++i) {
-    const text = rectText(track, i);
-    if (text === last) continue;
-    starts.push(track.times[i]!);
-    texts.push((last = text));
-  }
-  const times = Float64Array.from(starts);
+  const firsts = changesOf(track, ['x', 'y', 'width', 'height']);
+  const times = Float64Array.from(firsts, (index) => track.times[index]!);
+  const textOf = (place: number) => (place >= 0 ? rectText(track, firsts[place]!) : '');
   return {
     title: 'Hover',
     height: 18,
@@ -372,13 +374,13 @@ function hoverLane(session: Session): Lane | undefined {
         (index) => ({
           start: times[index]!,
           end: times[index + 1] ?? session.duration,
-          text: texts[index]!,
+          text: textOf(index),
           colour: index % 2 ? canvas.palette.line : canvas.palette.grid,
           edge: canvas.palette.edge,
         }),
         true,
       ),
-    valueAt: (time) => texts[lastAt(times, time)] ?? '',
+    valueAt: (time) => textOf(lastAt(times, time)),
   };
 }
 
