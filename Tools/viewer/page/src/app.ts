@@ -4,6 +4,7 @@ import { Decoder } from './decoder/client';
 import { embeddedRecording, type EmbeddedRecording, type PackedText } from './decoder/embedded';
 import { EntriesPane } from './entries/pane';
 import { showCheck, showFacts } from './facts/pane';
+import { arrangeLanes } from './lanes/dialog';
 import { Timeline } from './lanes/timeline';
 import { assumption } from './model/checks';
 import { clock, shown } from './model/format';
@@ -246,6 +247,10 @@ export class App implements Page {
     this.timeline.invalidate();
     announce(this.stage.showsKeys ? 'Keys are shown' : 'Keys are masked');
     this.requestFrame();
+  }
+
+  arrangeLanes(): void {
+    arrangeLanes(this.timeline);
   }
 
   findEntries(): void {

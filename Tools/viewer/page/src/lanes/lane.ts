@@ -7,6 +7,8 @@ import type { Palette } from '../ui/palette';
 import type { Range } from './axis';
 
 export interface Lane {
+  /// Tells it from all others, in every recording.
+  id: string;
   title: string;
   /// Of a stream that no reader finds.
   isHidden?: boolean;

@@ -17,6 +17,9 @@ export interface LaneOptions {
   region: () => Rect;
 }
 
+/// A lane before it is told from others of its name.
+type NamelessLane = Omit<Lane, 'id'>;
+
 export function lanesOf(session: Session, options: LaneOptions): Lane[] {
   const lanes = [
     slideLane(session),
@@ -33,13 +36,22 @@ export function lanesOf(session: Session, options: LaneOptions): Lane[] {
     cpuLane(session),
     ...session.hidden.slice(0, mostHidden).map((hidden) => hiddenLane(hidden, options)),
   ];
-  return lanes.filter((lane): lane is Lane => lane !== undefined);
+  return identified(lanes.filter((lane): lane is NamelessLane => lane !== undefined));
+}
+
+/// Two hidden streams may have one name.
+function identified(lanes: NamelessLane[]): Lane[] {
+  const names = lanes.map(({ title, isHidden }) => (isHidden ? `${title} (hidden)` : title));
+  return lanes.map((lane, i) => {
+    const sooner = names.slice(0, i).filter((name) => name === names[i]).length;
+    return { ...lane, id: sooner > 0 ? `${names[i]} ${sooner + 1}` : names[i]! };
+  });
 }
 
 const mostHidden = 12;
 
 /// When a stream that no reader finds has entries.
-function hiddenLane({ stream, track }: HiddenStream, { showsKeys }: LaneOptions): Lane | undefined {
+function hiddenLane({ stream, track }: HiddenStream, { showsKeys }: LaneOptions): NamelessLane | undefined {
   if (!track || track.count === 0) return undefined;
   const rows = new StreamRows(track, showsKeys);
   return {
@@ -82,7 +94,7 @@ function bandLane(
   title: string,
   textOf: (track: Track, index: number) => string,
   colourOf: (name: BandName) => number,
-): Lane | undefined {
+): NamelessLane | undefined {
   const track = filled(session, kind);
   return (
     track && {
@@ -106,7 +118,7 @@ function bandLane(
 
 const textsOf = (column: string) => (track: Track, index: number) => track.text(column, index);
 
-function textLane(session: Session, kind: string, column: string, title: string): Lane | undefined {
+function textLane(session: Session, kind: string, column: string, title: string): NamelessLane | undefined {
   const colours = new NameColours();
   return bandLane(session, kind, title, textsOf(column), ({ text, time }) =>
     colours.of(appAt(session, time) || text),
@@ -119,7 +131,7 @@ function appAt(session: Session, time: number): string {
   return index >= 0 ? track!.text('name', index) : '';
 }
 
-function slideLane(session: Session): Lane | undefined {
+function slideLane(session: Session): NamelessLane | undefined {
   const kinds: [string, string][] = [
     ['slideTitles', 'title'],
     ['slideText', 'text'],
@@ -135,7 +147,7 @@ function rectText(track: Track, index: number): string {
 }
 
 /// Shown on its own only where there are no names for its windows.
-function windowLane(session: Session): Lane | undefined {
+function windowLane(session: Session): NamelessLane | undefined {
   if (filled(session, 'topmostAppName') || filled(session, 'topmostWindowTitle')) return undefined;
   const colours = new NameColours();
   return bandLane(session, 'topmostWindow', 'Window', rectText, ({ text }) => colours.of(text));
@@ -143,7 +155,7 @@ function windowLane(session: Session): Lane | undefined {
 
 const roomForClicks = 6; // pixels to a click, from which on each is drawn
 
-function clickLane({ clicks }: Session): Lane | undefined {
+function clickLane({ clicks }: Session): NamelessLane | undefined {
   if (clicks.length === 0) return undefined;
   const starts = Float64Array.from(clicks, ({ start }) => start);
   return {
@@ -195,7 +207,7 @@ function clickShape(button: string, x: number, y: number): Path2D {
 
 const roomForKeys = 12; // pixels to a key, from which on each shows what it is
 
-function keyLane(session: Session, { showsKeys }: LaneOptions): Lane | undefined {
+function keyLane(session: Session, { showsKeys }: LaneOptions): NamelessLane | undefined {
   const keys = () => session.keys(showsKeys())!;
   if (!session.keys(false)?.count) return undefined;
   return {
@@ -257,7 +269,7 @@ function usualGreatest(values: Float32Array): number {
   return some.length > 0 ? some[Math.floor(some.length * 0.995)]! : 1;
 }
 
-function scrollLane(session: Session): Lane | undefined {
+function scrollLane(session: Session): NamelessLane | undefined {
   const track = filled(session, 'scrollAction');
   if (!track) return undefined;
   const distances = valuesOf(track, (i) => track.number('y', i) || track.number('x', i));
@@ -305,7 +317,7 @@ function drawScroll(canvas: LaneCanvas, times: Float64Array, extremes: Extremes,
   }
 }
 
-function speedLane(session: Session): Lane | undefined {
+function speedLane(session: Session): NamelessLane | undefined {
   if (!filled(session, 'cursorLocation')) return undefined;
   const { times, values } = session.speed;
   const curve = { times, extremes: session.speedExtremes, low: 0, high: usualGreatest(values), shape: Math.sqrt };
@@ -324,7 +336,7 @@ function curveOf(track: Track, values: Float32Array, low: number, high: number):
   return { times: track.times, extremes: new Extremes(values), low, high };
 }
 
-function trailLane(session: Session, { region }: LaneOptions): Lane | undefined {
+function trailLane(session: Session, { region }: LaneOptions): NamelessLane | undefined {
   const track = filled(session, 'cursorLocation');
   if (!track) return undefined;
   const [xs, ys] = [session.positionExtremes('x'), session.positionExtremes('y')];
@@ -358,7 +370,7 @@ function changesOf(track: Track, names: string[]): number[] {
 }
 
 /// Rectangles that stay the same are one.
-function hoverLane(session: Session): Lane | undefined {
+function hoverLane(session: Session): NamelessLane | undefined {
   const track = filled(session, 'hoverRect');
   if (!track) return undefined;
   const firsts = changesOf(track, ['x', 'y', 'width', 'height']);
@@ -384,7 +396,7 @@ function hoverLane(session: Session): Lane | undefined {
   };
 }
 
-function opacityLane(session: Session): Lane | undefined {
+function opacityLane(session: Session): NamelessLane | undefined {
   const track = filled(session, 'cursorOpacity');
   if (!track) return undefined;
   const curve = curveOf(
@@ -401,7 +413,7 @@ function opacityLane(session: Session): Lane | undefined {
   };
 }
 
-function cpuLane(session: Session): Lane | undefined {
+function cpuLane(session: Session): NamelessLane | undefined {
   const track = filled(session, 'cpuUsage');
   if (!track) return undefined;
   const values = valuesOf(track, (i) => track.number('cpuUsage', i));

@@ -12,6 +12,7 @@ const keys: [string, string][] = [
   ['Home End', 'To the start or the end'],
   ['+ − 0', 'Zoom the lanes in or out, show all'],
   ['< >', 'Move the lanes back or on'],
+  ['a', 'Arrange the lanes: hide, move, resize, pin'],
   ['/', 'Filter the entries'],
   ['n N', 'Next or previous match'],
   ['Ctrl C', 'Copy the selected entries as CSV; Esc selects none'],
@@ -40,7 +41,7 @@ function rows(entries: [string, string][]): HTMLElement {
   );
 }
 
-function fill(dialog: HTMLDialogElement, id: string, title: string, ...content: Node[]): void {
+export function fillDialog(dialog: HTMLDialogElement, id: string, title: string, ...content: Node[]): void {
   const close = make('button', { type: 'button', class: 'button is-icon', 'aria-label': 'Close' });
   setIcon(close, 'close');
   close.addEventListener('click', () => dialog.close());
@@ -48,9 +49,9 @@ function fill(dialog: HTMLDialogElement, id: string, title: string, ...content: 
     make('div', { class: 'dialog-head' }, make('h2', { id }, title), close),
     make('div', { class: 'dialog-body' }, ...content),
   );
-  dialog.addEventListener('click', (event) => {
+  dialog.onclick = (event) => {
     if (event.target === dialog) dialog.close(); // beside it
-  });
+  };
 }
 
 function aboutContent(): Node[] {
@@ -88,8 +89,8 @@ function aboutContent(): Node[] {
 export function setUpDialogs(): void {
   const help = byId<HTMLDialogElement>('help-dialog');
   const about = byId<HTMLDialogElement>('about-dialog');
-  fill(help, 'help-title', 'Keys and gestures', rows(keys), make('h3', {}, 'Pointer'), rows(gestures));
-  fill(about, 'about-title', 'About this page', ...aboutContent());
+  fillDialog(help, 'help-title', 'Keys and gestures', rows(keys), make('h3', {}, 'Pointer'), rows(gestures));
+  fillDialog(about, 'about-title', 'About this page', ...aboutContent());
   byId('help-button').addEventListener('click', showHelp);
   byId('about-button').addEventListener('click', () => about.showModal());
 }
@@ -110,7 +111,7 @@ export function ask(title: string, text: string, yes: string): Promise<boolean> 
       });
       return element;
     };
-    fill(
+    fillDialog(
       dialog,
       'confirm-title',
       title,

@@ -24,4 +24,5 @@ export interface Page {
   switchLayer(id: string): void;
   switchKeys(): void;
   findEntries(): void;
+  arrangeLanes(): void;
 }
