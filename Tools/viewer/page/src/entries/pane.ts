@@ -16,6 +16,8 @@ export interface EntriesEvents {
   onSeek: (time: number) => void;
   onSave: () => void;
   onProblem: (text: string) => void;
+  /// Another stream or filter was chosen.
+  onChange: () => void;
 }
 
 const mostCopied = 500_000;
@@ -65,7 +67,10 @@ export class EntriesPane {
       this.table.element,
     );
     this.stream.addEventListener('change', () => this.choose(this.stream.value));
-    this.query.addEventListener('input', () => this.filter());
+    this.query.addEventListener('input', () => {
+      this.filter();
+      this.events.onChange();
+    });
     this.query.addEventListener('keydown', (event) => {
       if (event.key !== 'Enter') return;
       event.preventDefault();
@@ -108,6 +113,23 @@ export class EntriesPane {
     this.choose('');
   }
 
+  /// Empty for all streams.
+  get chosenStream(): string {
+    return this.stream.value;
+  }
+
+  get filterText(): string {
+    return this.query.value;
+  }
+
+  /// Shows the entries of a stream that fit a filter, each only if it is given. A stream that is not there is none.
+  look(stream: string | undefined, filter: string | undefined): void {
+    if (filter !== undefined) this.query.value = filter;
+    const isThere = [...this.stream.options].some(({ value }) => value === stream);
+    if (stream !== undefined && isThere) this.stream.value = stream;
+    if (filter !== undefined || (stream !== undefined && isThere)) this.choose(this.stream.value);
+  }
+
   focusFilter(): void {
     this.query.focus();
     this.query.select();
@@ -141,6 +163,7 @@ export class EntriesPane {
     const { time } = this;
     this.time = -1;
     this.setTime(Math.max(0, time));
+    this.events.onChange();
   }
 
   private hiddenStream(choice: string): HiddenStream | undefined {

@@ -6,6 +6,7 @@ import { brief, titleOf } from '../model/format';
 import { Extremes } from '../model/extremes';
 import { keyCap } from '../model/keys';
 import type { Rect } from '../model/geometry';
+import type { Note } from '../model/notes';
 import { countBefore, countUntil, lastAt } from '../model/search';
 import { rectAt, type HiddenStream, type Session } from '../model/session';
 import type { Track } from '../model/track';
@@ -15,6 +16,8 @@ export interface LaneOptions {
   showsKeys: () => boolean;
   /// What of the screen the movie shows.
   region: () => Rect;
+  /// By time.
+  notes: () => readonly Note[];
 }
 
 /// A lane before it is told from others of its name.
@@ -22,6 +25,7 @@ type NamelessLane = Omit<Lane, 'id'>;
 
 export function lanesOf(session: Session, options: LaneOptions): Lane[] {
   const lanes = [
+    notesLane(session, options),
     slideLane(session),
     textLane(session, 'topmostAppName', 'name', 'Application'),
     textLane(session, 'topmostWindowTitle', 'title', 'Window'),
@@ -49,6 +53,28 @@ function identified(lanes: NamelessLane[]): Lane[] {
 }
 
 const mostHidden = 12;
+
+const noteEnd = 0.6; // seconds after which a note is no longer that of the playhead
+
+function notesLane({ duration }: Session, { notes }: LaneOptions): NamelessLane | undefined {
+  const all = notes();
+  if (all.length === 0) return undefined;
+  const times = Float64Array.from(all, ({ time }) => time);
+  return {
+    title: 'Notes',
+    height: 23,
+    draw: (canvas) =>
+      drawBands(canvas, times, (index) => {
+        const { bands, bandEdges } = canvas.palette;
+        const [start, end] = [times[index]!, times[index + 1] ?? duration];
+        return { start, end, text: all[index]!.text, colour: bands[2]!, edge: bandEdges[2]! };
+      }),
+    valueAt: (time) => {
+      const index = lastAt(times, time);
+      return index >= 0 && time - times[index]! < noteEnd ? all[index]!.text : '';
+    },
+  };
+}
 
 /// When a stream that no reader finds has entries.
 function hiddenLane({ stream, track }: HiddenStream, { showsKeys }: LaneOptions): NamelessLane | undefined {

@@ -137,6 +137,18 @@ export class Timeline {
     this.invalidate();
   }
 
+  /// After the notes changed.
+  refreshLanes(): void {
+    if (!this.session) return;
+    this.lanes = lanesOf(this.session, this.events);
+    this.placeLanes();
+  }
+
+  /// What the lanes show; undefined if it is everything.
+  get zoomed(): Range | undefined {
+    return this.range.to - this.range.from < this.duration ? this.range : undefined;
+  }
+
   private change(how: () => void): void {
     how();
     this.rearrange();

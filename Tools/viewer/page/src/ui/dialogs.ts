@@ -13,6 +13,7 @@ const keys: [string, string][] = [
   ['+ − 0', 'Zoom the lanes in or out, show all'],
   ['< >', 'Move the lanes back or on'],
   ['a', 'Arrange the lanes: hide, move, resize, pin'],
+  ['b', 'Write a note at the playhead'],
   ['/', 'Filter the entries'],
   ['n N', 'Next or previous match'],
   ['Ctrl C', 'Copy the selected entries as CSV; Esc selects none'],
@@ -27,7 +28,8 @@ const gestures: [string, string][] = [
   ['Wheel', 'Scroll; with Ctrl zoom the lanes at the pointer, with Shift move them'],
   ['Drag', 'Move the lanes, or the playhead where all is in sight'],
   ['Click', 'Go there, in a lane or in the table'],
-  ['Link', 'Add #t=12.5 to the address to open at a time'],
+  ['Drag', 'The name of a lane to another place, or the edge below it to another height'],
+  ['Link', 'The address holds the time, the zoom, the stream, the filter and the layers'],
 ];
 
 function rows(entries: [string, string][]): HTMLElement {

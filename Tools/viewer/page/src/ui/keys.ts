@@ -23,6 +23,7 @@ export function setUpKeys(page: Page): void {
     '<': () => page.pan(-0.25),
     '>': () => page.pan(0.25),
     a: () => page.arrangeLanes(),
+    b: () => page.writeNote(),
     '/': () => page.findEntries(),
     n: () => page.stepMatch(1),
     N: () => page.stepMatch(-1),

@@ -25,4 +25,5 @@ export interface Page {
   switchKeys(): void;
   findEntries(): void;
   arrangeLanes(): void;
+  writeNote(): void;
 }
