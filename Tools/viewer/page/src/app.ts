@@ -1,15 +1,17 @@
 // The page: a recording, a player, and everything that shows where they are.
 
 import { Decoder } from './decoder/client';
-import { embeddedRecording, type EmbeddedRecording } from './decoder/embedded';
+import { embeddedRecording, type EmbeddedRecording, type PackedText } from './decoder/embedded';
 import { EntriesPane } from './entries/pane';
 import { showCheck, showFacts } from './facts/pane';
+import { arrangeLanes } from './lanes/dialog';
 import { Timeline } from './lanes/timeline';
 import { assumption } from './model/checks';
 import { clock, shown } from './model/format';
 import { markerAfter, markerBefore } from './model/markers';
 import { Session, type Decoded } from './model/session';
-import { timeInLink, linkTo } from './model/link';
+import { linkTo, linkToView, partsOf, rangeIn, timeInLink } from './model/link';
+import { NotesPane } from './notes/pane';
 import { layers } from './stage/layers';
 import { Player } from './stage/player';
 import { Stage } from './stage/stage';
@@ -38,19 +40,25 @@ export class App implements Page {
   private shownMovie = '';
   private drawnTime = -1;
   private opened = 0;
+  /// The recording whose entries are shown as the address says.
+  private linked: Session | undefined;
   finished = 0;
   private controls!: Controls;
   private readonly timeline: Timeline;
   private readonly entries: EntriesPane;
+  private readonly notes: NotesPane;
+  private readonly usualLayers = layersOn();
 
   constructor() {
     const showsKeys = () => this.stage.showsKeys;
     this.timeline = new Timeline({
       showsKeys,
       region: () => this.stage.placement.region,
+      notes: () => this.notes.all,
       onSeek: (time) => this.seek(time),
       onRange: ({ from, to }) => {
         this.stage.setHeatRange(from, to);
+        this.writeLink();
         this.requestFrame();
       },
     });
@@ -59,6 +67,16 @@ export class App implements Page {
       onSeek: (time) => this.seek(time),
       onSave: () => void this.save(),
       onProblem: (text) => this.complain(text),
+      onChange: () => this.writeLink(),
+    });
+    this.notes = new NotesPane({
+      time: () => this.player.time,
+      onSeek: (time) => this.seek(time),
+      onProblem: (text) => this.complain(text),
+      onChange: () => {
+        this.timeline.refreshLanes();
+        this.requestFrame();
+      },
     });
   }
 
@@ -78,7 +96,10 @@ export class App implements Page {
       this.requestFrame();
     });
     byId('notice-close').addEventListener('click', () => void (byId('notice').hidden = true));
-    window.addEventListener('hashchange', () => this.followLink());
+    window.addEventListener('hashchange', () => {
+      this.followLink();
+      this.followLinkToEntries();
+    });
     this.player.onChange = () => this.playerChanged();
     this.player.onPicture = () => this.pictureChanged();
     this.stage.images.onDecoded = () => this.requestFrame();
@@ -116,7 +137,7 @@ export class App implements Page {
   }
 
   /// What is open stays where the new one cannot be read.
-  private async open(source: Blob | string, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
+  private async open(source: Blob | PackedText, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
     const opening = ++this.opened;
     document.body.classList.add('is-busy');
     setText(byId('welcome-title'), `Opening ${shown(name)}…`);
@@ -159,6 +180,7 @@ export class App implements Page {
     const canHavePictures = session.container !== 'stream';
     this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration, session.movieDuration === undefined);
     this.stage.show(session);
+    this.notes.show(session);
     this.timeline.show(session, this.player.duration);
     this.followLink();
     this.frame();
@@ -170,6 +192,7 @@ export class App implements Page {
   private showDetails(session: Session): void {
     if (session !== this.session) return;
     this.entries.show(session);
+    this.followLinkToEntries();
     showFacts(session, this.player.duration);
     showCheck(session, this.player.size);
     this.requestFrame();
@@ -216,15 +239,37 @@ export class App implements Page {
     this.timeline.pan(part);
   }
 
+  /// Parts that the address lacks change nothing.
   private followLink(): void {
+    if (!this.session) return;
+    const parts = partsOf(location.hash);
+    const zoom = rangeIn(parts.get('zoom'));
+    if (zoom) this.timeline.setRange(zoom);
     const time = timeInLink(location.hash);
-    if (time !== undefined && this.session && Math.abs(time - this.player.time) > 0.0005) this.seek(time);
+    if (time !== undefined && Math.abs(time - this.player.time) > 0.0005) this.seek(time);
+    const wanted = parts.get('layers')?.split(',');
+    if (wanted) for (const layer of layers) layer.isOn = wanted.includes(layer.id);
+    this.controls.showState();
+    this.requestFrame();
   }
 
-  /// The address tells the time, but not sixty times a second: browsers allow few changes.
+  private followLinkToEntries(): void {
+    const parts = partsOf(location.hash);
+    this.entries.look(parts.get('stream'), parts.get('filter'));
+    this.linked = this.session;
+  }
+
+  /// The address tells what is shown, but not sixty times a second: browsers allow few changes.
   private writeLink = debounced(() => {
-    if (!this.session || this.player.playing) return;
-    const link = linkTo(this.player.time);
+    if (!this.session || this.linked !== this.session || this.player.playing) return;
+    const on = layersOn();
+    const link = linkToView(location.hash, {
+      time: this.player.time,
+      zoom: this.timeline.zoomed,
+      stream: this.entries.chosenStream,
+      filter: this.entries.filterText,
+      layers: on.join() === this.usualLayers.join() ? undefined : on,
+    });
     if (link !== location.hash) history.replaceState(null, '', link);
   }, 300);
 
@@ -236,6 +281,7 @@ export class App implements Page {
     layer.isOn = !layer.isOn;
     this.controls.showState();
     announce(`${layer.name} ${layer.isOn ? 'shown' : 'hidden'}`);
+    this.writeLink();
     this.requestFrame();
   }
 
@@ -246,6 +292,15 @@ export class App implements Page {
     this.timeline.invalidate();
     announce(this.stage.showsKeys ? 'Keys are shown' : 'Keys are masked');
     this.requestFrame();
+  }
+
+  arrangeLanes(): void {
+    arrangeLanes(this.timeline);
+  }
+
+  writeNote(): void {
+    showTab('tab-notes');
+    this.notes.focusField();
   }
 
   findEntries(): void {
@@ -353,6 +408,10 @@ function wordsOf(error: unknown, name = ''): string {
   const words = (error instanceof Error ? error.message : String(error)).replace(/\.$/, '');
   const clause = name && words.startsWith(`${name}: `) ? words.slice(name.length + 2) : words;
   return /^(begins|is) /.test(clause) ? `it ${clause}` : clause;
+}
+
+function layersOn(): string[] {
+  return layers.filter(({ isOn }) => isOn).map(({ id }) => id);
 }
 
 const firstAtoms = /^(ftyp|mdat|moov|free|skip|wide|RIFF)$/;

@@ -4,7 +4,10 @@ import type { Decoded } from '../model/session';
 
 /// What was opened is named by the request that opened it; of all that was, `keep` closes the others.
 export type Request =
-  | { id: number; type: 'open'; source: Blob | string; name: string; reports: boolean }
+  /// Of the text of a page; they come before it is opened.
+  | { id: number; type: 'piece'; text: string }
+  /// A file, or the size of the one that the pieces hold.
+  | { id: number; type: 'open'; source: Blob | number; name: string; reports: boolean }
   | { id: number; type: 'keep'; opened: number }
   | { id: number; type: 'dump'; opened: number };
 

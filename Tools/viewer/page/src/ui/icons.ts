@@ -28,6 +28,8 @@ const paths: Record<string, string> = {
   fit: '<path d="M3 6v8M17 6v8M6 10h8M6 10l2-2M6 10l2 2M14 10l-2-2M14 10l-2 2"/>',
   plus: '<path d="M10 4.500v11M4.500 10h11"/>',
   minus: '<path d="M4.500 10h11"/>',
+  pin: '<path d="M7 3h6l-1 5 3 3H5l3-3zM10 11v6"/>',
+  lanes: '<path d="M3 5h14M3 10h9M3 15h12"/>',
   good: '<circle cx="10" cy="10" r="7.500"/><path d="m6.500 10.200 2.400 2.400 4.600-5"/>',
   bad: '<path d="M10 3 18 16.500H2z"/><path d="M10 8v4"/><circle cx="10" cy="14.300" r=".5" fill="currentColor"/>',
 };

@@ -24,4 +24,6 @@ export interface Page {
   switchLayer(id: string): void;
   switchKeys(): void;
   findEntries(): void;
+  arrangeLanes(): void;
+  writeNote(): void;
 }
