@@ -162,8 +162,8 @@ class Recording(Mapping[Kind, _Records]):
         return _table_of(self._opened().states(asked, interpolate == "linear"))
 
     def insights(self, name: str, **parameters: float) -> _Records:
-        """Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path" or
-        "camera", with one record for each. Parameters change the defaults of the C++ library, by their names in lower
+        """Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms",
+        "cursor_path", "camera", "activity" or "applications", with one record for each. Parameters change the defaults of the C++ library, by their names in lower
         case with underscores, such as `least=3`. Another name raises a `ValueError`."""
         return _table_of(self._opened().insight(name, {key: float(value) for key, value in parameters.items()}))
 
