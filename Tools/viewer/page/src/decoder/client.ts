@@ -1,7 +1,8 @@
 // The page's side of the decoder.
 
+import type { Table } from '#decoder';
 import type { Decoded } from '../model/session';
-import type { Reply, Request } from './protocol';
+import type { InsightName, Reply, Request } from './protocol';
 import DecoderWorker from './worker?worker&inline';
 
 type Wish = Request extends infer One ? (One extends Request ? Omit<One, 'id'> : never) : never;
@@ -38,6 +39,13 @@ export class Decoder {
     const reply = await this.ask({ type: 'dump', opened: this.kept });
     if (reply.type !== 'dumped') throw new DecoderError('the decoder answered something else');
     return reply.text;
+  }
+
+  /// What the library computes from what is kept.
+  async insights(name: InsightName, parameters: Record<string, number>): Promise<Table> {
+    const reply = await this.ask({ type: 'insights', opened: this.kept, name, parameters });
+    if (reply.type !== 'computed') throw new DecoderError('the decoder answered something else');
+    return reply.table;
   }
 
   private ask(wish: Wish): Promise<Reply> {

@@ -83,17 +83,21 @@ function keep(id: number): void {
   }
 }
 
+function kept(id: number): Recording {
+  const recording = recordings.get(id);
+  if (!recording) throw new ZulmError('the recording has to be opened again');
+  return recording;
+}
+
 async function answer(request: Request): Promise<[Reply, ArrayBuffer[]]> {
   const { id } = request;
   if (request.type === 'keep') {
     keep(request.opened);
     return [{ id, type: 'kept' }, []];
   }
-  if (request.type === 'dump') {
-    const recording = recordings.get(request.opened);
-    if (!recording) throw new ZulmError('the recording has to be opened again');
-    return [{ id, type: 'dumped', text: recording.dump() }, []];
-  }
+  if (request.type === 'dump') return [{ id, type: 'dumped', text: kept(request.opened).dump() }, []];
+  if (request.type === 'insights')
+    return [{ id, type: 'computed', table: kept(request.opened).insights(request.name, request.parameters) }, []];
   const { source, name, reports } = request;
   const recording = await Recording.open(typeof source === 'string' ? bytesOf(source) : source, name);
   recordings.set(id, recording);
