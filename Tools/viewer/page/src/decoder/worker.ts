@@ -102,6 +102,10 @@ async function answer(request: Exclude<Request, { type: 'piece' }>): Promise<[Re
   }
   if (request.type === 'dump')
     return [{ id, type: 'dumped', text: await using(request.opened, (recording) => recording.dump()) }, []];
+  if (request.type === 'insights') {
+    const { opened, name, parameters } = request;
+    return [{ id, type: 'computed', table: await using(opened, (recording) => recording.insights(name, parameters)) }, []];
+  }
   const { source, name, reports } = request;
   recordings.set(id, reopening(source, name));
   const opened = await open(id, name, reports);
