@@ -136,7 +136,7 @@ export class Recording {
    * `shows_keys` is true, a bullet takes the place of what was typed.
    */
   insights(
-    name: 'clicks' | 'captions' | 'idle' | 'chapters' | 'zooms' | 'cursor_path' | 'camera',
+    name: 'clicks' | 'captions' | 'idle' | 'chapters' | 'zooms' | 'cursor_path' | 'camera' | 'activity' | 'applications',
     parameters?: Record<string, number | boolean>,
   ): Table;
   /**

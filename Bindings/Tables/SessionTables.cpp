@@ -293,6 +293,31 @@ Table cameraRows(const InsightSources& sources, const InsightOptions& options, d
     return table;
 }
 
+/// One row.
+Table activityRows(const InsightSources& sources, const InsightOptions& options, double) {
+    const std::array rows{activityOf(sources, options)};
+    const auto count = [](std::size_t number) { return static_cast<double>(number); };
+    Table table{startsOf(rows), {}};
+    table.add("end", rows, [](const Activity& activity) { return activity.end; });
+    table.add("clicks", rows, [&](const Activity& activity) { return count(activity.clicks); });
+    table.add("keys", rows, [&](const Activity& activity) { return count(activity.keys); });
+    table.add("scrolls", rows, [&](const Activity& activity) { return count(activity.scrolls); });
+    table.add("idle", rows, [](const Activity& activity) { return activity.idle; });
+    table.add("distance", rows, [](const Activity& activity) { return activity.distance; });
+    return table;
+}
+
+/// One row for each application.
+Table applicationRows(const InsightSources& sources, const InsightOptions& options, double) {
+    const std::vector<ApplicationTime> applications = activityOf(sources, options).applications;
+    Table table;
+    for (const ApplicationTime& application : applications)
+        table.times.push_back(application.first);
+    table.add("name", applications, [](const ApplicationTime& application) { return Text(application.name); });
+    table.add("duration", applications, [](const ApplicationTime& application) { return application.duration; });
+    return table;
+}
+
 constexpr double s_usualRate = 30; // rows in a second
 
 const std::vector<InsightTable>& insightTables() {
@@ -338,6 +363,15 @@ const std::vector<InsightTable>& insightTables() {
           {"follows_cursor", setOption<&Options::camera, &CameraOptions::followsCursor>},
           {"dead_zone", setOption<&Options::camera, &CameraOptions::deadZone>}},
          cameraRows},
+        {"activity",
+         {{"start", setOption<&Options::activity, &ActivitySpan::start>},
+          {"end", setOption<&Options::activity, &ActivitySpan::end>},
+          {"least", setOption<&Options::idle, &IdleOptions::least>}},
+         activityRows},
+        {"applications",
+         {{"start", setOption<&Options::activity, &ActivitySpan::start>},
+          {"end", setOption<&Options::activity, &ActivitySpan::end>}},
+         applicationRows},
     };
     return tables;
 }

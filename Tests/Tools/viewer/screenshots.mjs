@@ -24,12 +24,12 @@ async function take(name, options, show) {
 
 test('pictures', async () => {
   await take('playing', {}, async (page) => {
-    await page.keyboard.press('k');
+    await page.keyboard.press('t');
     await seek(page, 4.35);
   });
   await take('light', { theme: 'light' }, async (page) => {
     await page.getByRole('tab', { name: 'Facts' }).click();
-    await page.keyboard.press('k');
+    await page.keyboard.press('t');
     await seek(page, 3.1);
   });
   await take('heat-map', {}, async (page) => {

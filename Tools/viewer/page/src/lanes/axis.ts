@@ -1,9 +1,8 @@
 // Time along the lanes.
 
-export interface Range {
-  from: number;
-  to: number;
-}
+import type { TimeRange } from '../model/link';
+
+export type Range = TimeRange;
 
 const steps = [0.001, 0.002, 0.005, 0.01, 0.02, 0.05, 0.1, 0.2, 0.5, 1, 2, 5, 10, 15, 30, 60, 120, 300, 600, 900, 1800];
 
