@@ -154,10 +154,11 @@ void AccessibilityProcess::windowChanged(std::uint32_t process) {
     send(fmt::format("window {}\n", process));
 }
 
-void AccessibilityProcess::ask() {
-    if (asked_ || !isAlive())
+void AccessibilityProcess::ask(Instant interval) {
+    const Instant instant = now();
+    if (asked_ || !isAlive() || instant < lastAsked_ + interval)
         return;
-    asked_ = now();
+    asked_ = lastAsked_ = instant;
     askedWindow_ = windows_;
     send("ask\n");
 }

@@ -99,7 +99,7 @@ void Camera::finish(Instant end) {
     encoding_.join();
     const Instant length = std::min(end, pausedAt_.value_or(end)) - zero_.value_or(end) - paused_;
     if (error_.empty())
-        writer_.finish(length * s_pictureTimescale / s_second);
+        writer_.finish(inUnits(length, s_pictureTimescale));
 }
 
 std::optional<Instant> Camera::movieLength(Instant instant) const {
@@ -199,8 +199,7 @@ std::optional<std::int64_t> Camera::movieTime(Instant instant) {
             zero_ = instant;
             countTicksFrom(instant);
         }
-        const Instant length = instant - *zero_ - paused_;
-        time = std::max(lastTime_ + 1, (length * s_pictureTimescale + s_second / 2) / s_second);
+        time = std::max(lastTime_ + 1, inUnits(instant - *zero_ - paused_, s_pictureTimescale));
         lastTime_ = time;
     }
     if (isFirst)

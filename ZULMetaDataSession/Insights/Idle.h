@@ -1,6 +1,6 @@
 #pragma once
 
-// When the person in front of the machine did nothing.
+// The times at which nobody used the machine.
 //
 //     for (const IdleSpan& span : idleSpansOf(positions, actions, keys, scrolling, duration))
 //         std::cout << "idle from " << span.start << " s to " << span.end << " s\n";

@@ -28,7 +28,7 @@ test('a real desktop', { skip: !process.env.ZULM_RECORD }, async () => {
   const copying = keys.split('\n').find((line) => line.includes('"characterString":"C"'));
   for (const [name, theme] of Object.entries({ desktop: 'dark', 'desktop-light': 'light' }))
     await take(recording, name, { theme }, async (page) => {
-      await page.keyboard.press('k');
+      await page.keyboard.press('t');
       await seek(page, JSON.parse(copying).timestamp + 0.2);
     });
 });
@@ -36,12 +36,12 @@ test('a real desktop', { skip: !process.env.ZULM_RECORD }, async () => {
 test('a simulated session', async () => {
   const recording = recordedSession();
   await take(recording, 'playing', {}, async (page) => {
-    await page.keyboard.press('k');
+    await page.keyboard.press('t');
     await seek(page, 4.35);
   });
   await take(recording, 'light', { theme: 'light' }, async (page) => {
     await page.getByRole('tab', { name: 'Facts' }).click();
-    await page.keyboard.press('k');
+    await page.keyboard.press('t');
     await seek(page, 3.1);
   });
   await take(recording, 'heat-map', {}, async (page) => {

@@ -97,7 +97,7 @@ export function hugeMovie(gigabytes) {
 
 /// The page that `zulm view` wrote, without its recording.
 export function emptyPage(text) {
-  return text.replace(/<script type="application\/json" id="zulm-recording">[^<]*<\/script>\n?/, '');
+  return text.replace(/<script type="[a-z/]*" id="zulm-(recording|metadata)">[^<]*<\/script>\n?/g, '');
 }
 
 let browser;

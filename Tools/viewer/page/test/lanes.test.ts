@@ -1,7 +1,7 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
 import { clampedRange, tickDigits, ticks, tickStep, zoomed } from '../src/lanes/axis';
-import { Extremes } from '../src/lanes/extremes';
+import { Extremes } from '../src/model/extremes';
 import { speedOf } from '../src/model/speed';
 import { Track } from '../src/model/track';
 import { randomNumbers, syntheticEntries } from './synthetic';
