@@ -24,13 +24,15 @@ async function take(recording, name, options, show) {
 
 test('a real desktop', { skip: !process.env.ZULM_RECORD }, async () => {
   const recording = recordedDesktop();
-  const keys = zulm('dump', '--stream', 'keyboardAction', '--format', 'ndjson', recording.movie);
-  const copying = keys.split('\n').find((line) => line.includes('"characterString":"C"'));
-  for (const [name, theme] of Object.entries({ desktop: 'dark', 'desktop-light': 'light' }))
-    await take(recording, name, { theme }, async (page) => {
-      await page.keyboard.press('t');
-      await seek(page, JSON.parse(copying).timestamp + 0.2);
-    });
+  const actions = zulm('dump', '--stream', 'cursorAction', '--format', 'ndjson', recording.movie)
+    .split('\n')
+    .filter((line) => line.includes('left'))
+    .map((line) => JSON.parse(line));
+  const dropped = actions.filter(({ action }) => action === 'left up')[3]; // the terminal, by its title
+  await take(recording, 'desktop', {}, async (page) => {
+    await page.keyboard.press('t');
+    await seek(page, dropped.timestamp - 0.35);
+  });
 });
 
 test('a simulated session', async () => {
