@@ -9,7 +9,6 @@ if(ZULMETADATA_RECORDER)
   set_target_properties(ShownWindow PROPERTIES RUNTIME_OUTPUT_DIRECTORY ${CMAKE_CURRENT_BINARY_DIR})
   set(record_programs ZULM_RECORD=$<TARGET_FILE:zulm-record> SHOWN_WINDOW=$<TARGET_FILE:ShownWindow> ZULM=${ZULM_PATH})
 
-  find_package(fmt REQUIRED)
   zulm_add_tests(RecorderTests FragmentedMovieTest InstantTest ScrollAxisTest)
   target_sources(RecorderTests PRIVATE
     ${PROJECT_SOURCE_DIR}/Tools/record/Boxes.cpp ${PROJECT_SOURCE_DIR}/Tools/record/FragmentedMovie.cpp)
