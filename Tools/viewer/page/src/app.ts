@@ -18,6 +18,7 @@ import { Stage } from './stage/stage';
 import { setUpAutomation } from './ui/automation';
 import { setUpControls, type Controls } from './ui/controls';
 import { ask, setUpDialogs } from './ui/dialogs';
+import { breath } from './ui/breath';
 import { announce, byId, setText } from './ui/dom';
 import { setUpDrop } from './ui/drop';
 import { placeIcons } from './ui/icons';
@@ -148,7 +149,11 @@ export class App implements Page {
       mark('zulm:decoded');
       if (decoded.streams.length === 0 && decoded.hidden.length === 0) throw new Error(whyNothing(decoded));
       byId('notice').hidden = true;
-      this.show(new Session(complete(decoded)));
+      await breath(); // each step by itself, so that the page goes on
+      const session = new Session(complete(decoded));
+      await breath();
+      if (opening !== this.opened) return;
+      this.show(session);
       this.decoder.keep(id);
       if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
     } catch (error) {
