@@ -17,3 +17,6 @@ if(PkgConfig_FOUND)
     libavcodec>=59 libavformat>=59 libavutil libswscale libpulse atspi-2 gobject-2.0 glib-2.0)
   set(ZULMETADATA_RECORDER ${ZULMETADATA_RECORDER_LIBRARIES_FOUND})
 endif()
+if(ZULMETADATA_RECORDER)
+  find_package(fmt REQUIRED) # for the recorder, its tests and its fuzz target
+endif()

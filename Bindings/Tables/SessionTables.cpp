@@ -297,7 +297,7 @@ Table cameraRows(const InsightSources& sources, const InsightOptions& options, d
 Table activityRows(const InsightSources& sources, const InsightOptions& options, double) {
     const std::array rows{activityOf(sources, options)};
     const auto count = [](std::size_t number) { return static_cast<double>(number); };
-    Table table{startsOf(rows), {}};
+    Table table{startsOf(rows), {}, {}};
     table.add("end", rows, [](const Activity& activity) { return activity.end; });
     table.add("clicks", rows, [&](const Activity& activity) { return count(activity.clicks); });
     table.add("keys", rows, [&](const Activity& activity) { return count(activity.keys); });

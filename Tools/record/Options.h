@@ -4,12 +4,14 @@
 #include "Tools/record/PrivacyFilter.h"
 #include "Tools/record/VideoWriter.h"
 
-#include <CLI/CLI.hpp>
-
 #include <filesystem>
 #include <optional>
 #include <string>
 #include <vector>
+
+namespace CLI {
+class App;
+}
 
 namespace Recorder {
 

@@ -126,7 +126,7 @@ std::string recorderManPage(const Manual& manual) {
     return fmt::format(".TH ZULM-RECORD 1 \"\" \"zulm {}\" \"User Commands\"\n.nh\n.ad l\n.SH NAME\nzulm\\-record \\- "
                        "record the screen of an X display\n.SH SYNOPSIS\n.B {}\n.SH DESCRIPTION\n{}.\n.SH OPTIONS\n",
                        ZULM_VERSION, roff(command->usage()), roff(command->description)) +
-           roffOptions(command->options) + roffCodes(codes) +
+           roffOptions(command->options) + roffOptions(globalOptions(manual, *command)) + roffCodes(codes) +
            ".SH ENVIRONMENT\n.TP\n.B DISPLAY\nThe X display.\n.TP\n.B XDG_RUNTIME_DIR\nThe folder with the socket by "
            "which the recorder is controlled.\n.SH EXAMPLES\n" +
            roffExamples(command->examples) + ".SH SEE ALSO\n.BR zulm (1)\n";

@@ -16,6 +16,10 @@ if(ZULMETADATA_RECORDER)
 else()
   set(record_programs "")
 endif()
+# Somebody who works with an editor and a terminal.
+add_test(NAME Tools/record/Applications COMMAND ${PYTHON3} ${record_tests}/real_desktop.py)
+set_tests_properties(Tools/record/Applications PROPERTIES ENVIRONMENT "${record_programs}" SKIP_RETURN_CODE 77
+  TIMEOUT 600)
 # Each suite of the script is a test. They are skipped where the recorder is not built or no X server can be started.
 foreach(suite IN ITEMS Files Picture Sound Pointer Keys Windows Control Loss Privacy)
   add_test(NAME Tools/record/${suite} COMMAND ${PYTHON3} ${record_tests}/test_recorder.py ${suite})

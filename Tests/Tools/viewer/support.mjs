@@ -47,6 +47,17 @@ export function recordedSession() {
   return { movie: join(folder, 'Recording.mp4'), page: join(folder, 'Recording.html') };
 }
 
+/// A recording of an editor and a terminal that somebody uses, with its page beside it.
+export function recordedDesktop() {
+  const movie = join(folder, 'Desktop.mp4');
+  execFileSync('python3', [join(sources, 'Tests/Tools/record/real_desktop.py'), movie], {
+    stdio: ['ignore', 'ignore', 'inherit'],
+    env: { ...process.env, ZULM_RECORD: setting('ZULM_RECORD') },
+  });
+  zulm('view', 'Desktop.mp4', '-o', 'Desktop.html');
+  return { movie, page: join(folder, 'Desktop.html') };
+}
+
 /// An hour of metadata with that many cursor positions a second, and a movie of a picture a second.
 export function longRecording(name, rate) {
   const movie = join(folder, `${name}.mp4`);

@@ -28,6 +28,7 @@ import { afterIdle } from './transport/skipping';
 import { setUpAutomation } from './ui/automation';
 import { setUpControls, type Controls } from './ui/controls';
 import { ask, setUpDialogs } from './ui/dialogs';
+import { breath } from './ui/breath';
 import { announce, byId, setText } from './ui/dom';
 import { setUpDrop } from './ui/drop';
 import { placeIcons } from './ui/icons';
@@ -196,9 +197,15 @@ export class App implements Page {
       mark('zulm:decoded');
       if (decoded.streams.length === 0 && decoded.hidden.length === 0) throw new Error(whyNothing(decoded));
       byId('notice').hidden = true;
-      this.decoded = complete(decoded);
-      this.adjustment = adjustmentIn(location.hash);
-      this.show(this.adjustedSession());
+      await breath(); // each step by itself, so that the page goes on
+      if (opening !== this.opened) return;
+      const completed = complete(decoded);
+      const adjustment = adjustmentIn(location.hash);
+      const session = sessionOf(completed, adjustment);
+      await breath();
+      if (opening !== this.opened) return;
+      [this.decoded, this.adjustment] = [completed, adjustment];
+      this.show(session);
       this.decoder.keep(id);
       if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
     } catch (error) {
@@ -241,8 +248,7 @@ export class App implements Page {
   }
 
   private adjustedSession(): Session {
-    const { decoded, adjustment } = this;
-    return new Session(shifted(decoded!, adjustment.offset), adjustment.region);
+    return sessionOf(this.decoded!, this.adjustment);
   }
 
   private showSession(session: Session): void {
@@ -565,6 +571,10 @@ export class App implements Page {
       this.complain(`The entries could not be saved: ${wordsOf(error)}.`);
     }
   }
+}
+
+function sessionOf(decoded: Decoded, { offset, region }: Adjustment): Session {
+  return new Session(shifted(decoded, offset), region);
 }
 
 /// A page writes names in addresses with percent signs.
