@@ -236,6 +236,7 @@ export class App implements Page {
     this.player.setLength(session.duration, session.movieDuration === undefined);
     this.showSession(session);
     this.selection.setDuration(this.player.duration);
+    this.rangeBar.forget();
     this.selectionChanged();
     this.showDetails(session);
     this.writeLink();
@@ -313,8 +314,9 @@ export class App implements Page {
     const time = timeInLink(location.hash);
     if (!this.session) return;
     if (time !== undefined && Math.abs(time - this.player.time) > 0.0005) this.seek(time);
-    this.adjust(adjustmentIn(location.hash));
-    const text = partOf(location.hash, 'range');
+    const { hash } = location;
+    if (partOf(hash, 'offset') ?? partOf(hash, 'region')) this.adjust(adjustmentIn(hash));
+    const text = partOf(hash, 'range');
     const range = rangeIn(text);
     if (range && text !== this.rangeInLink()) this.selection.select(range.from, range.to);
   }
