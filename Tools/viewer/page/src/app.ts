@@ -266,6 +266,7 @@ export class App implements Page {
     this.player.setLength(session.duration, session.movieDuration === undefined);
     this.showSession(session);
     this.selection.setDuration(this.player.duration);
+    this.rangeBar.forget();
     this.selectionChanged();
     this.showDetails(session);
     this.writeLink();

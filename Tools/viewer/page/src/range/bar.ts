@@ -34,6 +34,7 @@ export class RangeBar {
   private asked = 0;
   /// Lines of a name and a value.
   private lines: [string, string][] = [];
+  private told: Range | undefined;
   readonly element = make('section', { class: 'range-bar', 'aria-label': 'Selection', hidden: true });
 
   constructor(
@@ -81,6 +82,8 @@ export class RangeBar {
     this.makeRoom();
     this.loop.setAttribute('aria-pressed', String(loops));
     this.heat.setAttribute('aria-pressed', String(hasHeat));
+    if (range === this.told) return;
+    this.told = range;
     const asked = ++this.asked;
     clearTimeout(this.timer);
     if (!range) return;
@@ -93,6 +96,11 @@ export class RangeBar {
     setText(this.facts, `${decimal(range.to - range.from)} s`);
     this.element.classList.add('is-asking');
     this.timer = setTimeout(() => void this.ask(range, asked), patience);
+  }
+
+  /// What was told before is not true any more.
+  forget(): void {
+    this.told = undefined;
   }
 
   private async ask(range: Range, asked: number): Promise<void> {
