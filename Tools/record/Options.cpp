@@ -67,8 +67,6 @@ void requireOutput(const Options& options) {
 void requireSense(const Options& options, const GivenOptions& given) {
     if (given.pause + given.resume + given.stop + (given.recover ? 1 : 0) > 1)
         throw Refusal("give one of --pause, --resume, --stop and --recover");
-    if (options.task == Task::Record)
-        requireOutput(options);
     if (options.deletesFolder && !given.recover)
         throw Refusal("--delete can only be given together with --recover");
     if (options.stopsOnClose && options.window.empty())
@@ -78,6 +76,8 @@ void requireSense(const Options& options, const GivenOptions& given) {
     const int places = (options.region ? 1 : 0) + (options.window.empty() ? 0 : 1) + (options.monitor.empty() ? 0 : 1);
     if (places > 1)
         throw Refusal("give one of --region, --window and --monitor");
+    if (options.task == Task::Record)
+        requireOutput(options);
 }
 
 void addControl(CLI::App& app, GivenOptions& given) {
@@ -120,8 +120,15 @@ void addMovie(CLI::App& app, GivenOptions& given) {
 }
 
 void addPrivacy(CLI::App& app, Options& options) {
-    const std::map<std::string, KeyMode> modes{
-        {"none", KeyMode::Nothing}, {"shortcuts", KeyMode::Shortcuts}, {"all", KeyMode::Everything}};
+    const auto numbered = [](std::string& word) {
+        const std::map<std::string, KeyMode> modes{
+            {"none", KeyMode::Nothing}, {"shortcuts", KeyMode::Shortcuts}, {"all", KeyMode::Everything}};
+        const auto found = modes.find(word);
+        if (found == modes.end())
+            return fmt::format("'{}' is not none, shortcuts or all", word);
+        word = std::to_string(static_cast<int>(found->second));
+        return std::string();
+    };
     app.add_option("--keys", options.keys,
                    "Which keys are recorded: none; shortcuts (unless it is given), which are keys that type no "
                    "character and keys with Ctrl, Alt or Super; or all. What is pressed in a password field, which the "
@@ -129,7 +136,7 @@ void addPrivacy(CLI::App& app, Options& options) {
                    "nothing. Terminals show no password fields: if a terminal uses the bus, what is typed into it, "
                    "such as a password for sudo, is recorded like any other text")
         ->type_name("none|shortcuts|all")
-        ->transform(CLI::CheckedTransformer(modes).description(""));
+        ->transform(CLI::Validator(numbered, ""));
     app.add_flag("--without-accessibility", options.withoutAccessibility,
                  "Do not ask the accessibility bus: with '--keys all', passwords are recorded too");
     app.add_option("--deny-app", options.deniedApps,

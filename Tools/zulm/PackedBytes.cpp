@@ -28,7 +28,7 @@ public:
     Deflater& operator=(const Deflater&) = delete;
 
     void take(std::string_view bytes, bool isLast) {
-        stream_.next_in = reinterpret_cast<const Bytef*>(bytes.data());
+        stream_.next_in = const_cast<Bytef*>(reinterpret_cast<const Bytef*>(bytes.data())); // zlib only reads it
         stream_.avail_in = static_cast<uInt>(bytes.size());
         do {
             stream_.next_out = reinterpret_cast<Bytef*>(piece_.data());

@@ -115,6 +115,7 @@ class Scene:
         lines = "\n\n".join(textwrap.fill(paragraph, 60) for paragraph in paragraphs)
         (desk.folder / NOTES).write_text(lines + "\n", encoding="utf-8")
         (desk.folder / "shell.rc").write_text(SHELL, encoding="utf-8")
+        desk.run("xset", "r", "off")  # on a busy machine a key seems to be held
         desk.run("xsetroot", "-solid", "#2d4a6b", "-cursor_name", "left_ptr")
         self.terminal = self.open(["xterm", "-T", "Terminal", "-fa", "DejaVu Sans Mono", "-fs", "11", "-bg", "#10151f",
                                    "-fg", "#d5dbe6", "-e", "bash", "--rcfile", "shell.rc"], "XTerm")
@@ -315,8 +316,9 @@ def failures_of(movie, person):
 
 def missing_programs():
     missing = [] if PROGRAMS["recorder"] else ["zulm-record, whose libraries 'scripts/install.sh record' installs"]
-    return missing + [name for name in ("Xvfb", "openbox", "xdotool", "xprop", "xwininfo", "xsetroot", "xterm", "l3afpad",
-                                        "dbus-daemon", "ffprobe") if not shutil.which(name)]
+    programs = ("Xvfb", "openbox", "xdotool", "xprop", "xwininfo", "xset", "xsetroot", "xterm", "l3afpad", "dbus-daemon",
+                "ffprobe")
+    return missing + [name for name in programs if not shutil.which(name)]
 
 
 def record(desk, name):
