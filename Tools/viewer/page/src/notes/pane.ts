@@ -25,7 +25,7 @@ export class NotesPane {
   private session: Session | undefined;
   private notes: Note[] = [];
   private readonly list = make('ol', { class: 'notes' });
-  private readonly status = make('output', { class: 'entries-status', 'aria-live': 'polite' });
+  private readonly status = make('output', { class: 'notes-status', 'aria-live': 'polite' });
   private readonly field = make('input', {
     class: 'field',
     'aria-label': 'Note at the playhead',
