@@ -11,7 +11,7 @@ export interface NotesEvents {
   time: () => number;
   onSeek: (time: number) => void;
   onProblem: (text: string) => void;
-  /// After a note came, went or changed.
+  /// Called after a note came, went or changed.
   onChange: () => void;
 }
 
