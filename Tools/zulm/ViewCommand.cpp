@@ -90,7 +90,7 @@ void writePage(OutputFile& file, const ViewOptions& options, const InputFile& in
                const ViewedRecording& recording) {
     std::ofstream stream = openOutput(file.temporaryPath(), options.output);
     const std::string text = scriptText(recording.document);
-    const std::size_t end = options.embed ? text.size() - std::strlen("\"}") : text.size(); // behind the address
+    const std::size_t end = options.embed ? text.size() - std::strlen("\"}") : text.size(); // of the address
     write(stream, page.front());
     write(stream, s_elementStart);
     write(stream, std::string_view(text).substr(0, end));
@@ -108,7 +108,7 @@ void writePage(OutputFile& file, const ViewOptions& options, const InputFile& in
     file.commit();
 }
 
-/// Where the page finds the movie; null where there is none to show.
+/// Returns what the page must know to find the movie, or null if there is none to show.
 Json movieFor(const ViewOptions& options, const InputFile& input, RecordingFile& recording) {
     const bool isStream = recording.container() == Container::RawStream;
     if (isStream && options.embed)

@@ -284,7 +284,7 @@ test('splitters tell their place, Escape closes the menu, keys move the lanes', 
 test('units and words are those of the reader', async () => {
   const { page, close } = await open(recording.page);
   await opened(page);
-  await page.keyboard.press('k');
+  await page.keyboard.press('t');
   await seek(page, 3.6);
   const labels = (await page.locator('.lane-labels').innerText()).replaceAll('\n', ' ');
   assert.match(labels, /CPU usage [\d.]+ %/);

@@ -47,6 +47,17 @@ export function recordedSession() {
   return { movie: join(folder, 'Recording.mp4'), page: join(folder, 'Recording.html') };
 }
 
+/// A recording of an editor and a terminal that somebody uses, with its page beside it.
+export function recordedDesktop() {
+  const movie = join(folder, 'Desktop.mp4');
+  execFileSync('python3', [join(sources, 'Tests/Tools/record/real_desktop.py'), movie], {
+    stdio: ['ignore', 'ignore', 'inherit'],
+    env: { ...process.env, ZULM_RECORD: setting('ZULM_RECORD') },
+  });
+  zulm('view', 'Desktop.mp4', '-o', 'Desktop.html');
+  return { movie, page: join(folder, 'Desktop.html') };
+}
+
 /// What a long recording holds; `rate` is in cursor positions a second.
 export const wholeDay = { rate: 174, hours: 8, keys: 100_000, titles: 50_000 };
 

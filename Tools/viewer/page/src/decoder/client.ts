@@ -1,9 +1,10 @@
 // The page's side of the decoder.
 
+import type { Table } from '#decoder';
 import type { Decoded } from '../model/session';
 import type { PackedText } from './embedded';
 import { piecesOf } from './packed';
-import type { Reply, Request } from './protocol';
+import type { InsightName, Reply, Request } from './protocol';
 import { unwrapped } from './wire';
 import DecoderWorker from './worker?worker&inline';
 
@@ -43,6 +44,13 @@ export class Decoder {
     const reply = await this.ask({ type: 'dump', opened: this.kept });
     if (reply.type !== 'dumped') throw new DecoderError('the decoder answered something else');
     return reply.text;
+  }
+
+  /// What the library computes from what is kept.
+  async insights(name: InsightName, parameters: Record<string, number>): Promise<Table> {
+    const reply = await this.ask({ type: 'insights', opened: this.kept, name, parameters });
+    if (reply.type !== 'computed') throw new DecoderError('the decoder answered something else');
+    return reply.table;
   }
 
   private ask(wish: Wish): Promise<Reply> {

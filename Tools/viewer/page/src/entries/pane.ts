@@ -135,6 +135,12 @@ export class EntriesPane {
     this.query.select();
   }
 
+  /// Shows the entries between two times.
+  showBetween(from: number, to: number): void {
+    this.query.value = `time>=${from} time<${to}`;
+    this.filter();
+  }
+
   /// After the reader has asked for what was typed, or no longer.
   refresh(): void {
     this.showNote();
@@ -176,7 +182,7 @@ export class EntriesPane {
     const kind = hidden?.stream.kind ?? this.stream.value;
     const notes = hidden ? [`No reader finds this stream. ${hidden.reason}`] : [];
     if (!this.events.showsKeys() && kind === 'keyboardAction')
-      notes.push('What was typed is masked, here and in copies. Press k to see it.');
+      notes.push('What was typed is masked, here and in copies. Press t to see it.');
     this.note.hidden = notes.length === 0;
     setText(this.note, notes.join(' '));
   }

@@ -189,7 +189,8 @@ export function drawBands(
     context.stroke();
     const room = { left: Math.max(0, x) + 6, right: right - 7 };
     if (width > 24 && text) drawBandText(canvas, text, room, isWhole);
-    i = right - x > 2 ? i + 1 : Math.max(i + 1, countBefore(times, canvas.time(x + 2)));
+    // Of those that begin within these two pixels, the last one may hold for long.
+    i = right - x > 2 ? i + 1 : Math.max(i + 1, countBefore(times, canvas.time(x + 2)) - 1);
   }
 }
 

@@ -28,8 +28,12 @@ export class Overview {
   private range: Range = { from: 0, to: 1 };
   private isStale = true;
 
-  constructor(private readonly onRange: (range: Range) => void) {
-    this.element.append(this.canvas, this.window, this.playhead);
+  /// `strip` shows the selection.
+  constructor(
+    private readonly onRange: (range: Range) => void,
+    strip: HTMLElement,
+  ) {
+    this.element.append(this.canvas, strip, this.window, this.playhead);
     this.setUpDragging();
   }
 

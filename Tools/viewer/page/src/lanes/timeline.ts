@@ -15,10 +15,15 @@ import { LaneLabel, type LabelEvents } from './labels';
 import { LaneCanvas, type Lane } from './lane';
 import { lanesOf, type LaneOptions } from './lanes';
 import { Overview } from './overview';
+import { SelectionView } from '../range/view';
 
 export interface TimelineEvents extends LaneOptions {
   onSeek: (time: number) => void;
   onRange: (range: Range) => void;
+  /// Asks for a selection between two times, in any order.
+  onSelect: (one: number, other: number) => void;
+  /// Moves the end of the selection that is at the playhead.
+  onExtend: (time: number) => void;
 }
 
 const rulerHeight = 26;
@@ -43,6 +48,7 @@ export class Timeline {
   private readonly otherLabels = make('div');
   private readonly labels = make('div', { class: 'lane-labels' }, this.pinnedLabels, this.otherLabels);
   private readonly pinnedCanvas = make('canvas', { class: 'pinned-canvas', 'aria-hidden': 'true' });
+  private readonly selection: SelectionView;
   private readonly lanesCanvas = make('canvas', { class: 'lanes-canvas', 'aria-hidden': 'true' });
   private readonly rulerCanvas = make('canvas', { class: 'ruler-canvas', 'aria-hidden': 'true' });
   private readonly ruler = make('div', {
@@ -67,12 +73,18 @@ export class Timeline {
   private readonly zoomText = make('span', { class: 'zoom-text' });
 
   constructor(private readonly events: TimelineEvents) {
-    this.overview = new Overview((range) => this.setRange(range));
+    this.selection = new SelectionView(events.onSelect);
+    this.overview = new Overview((range) => this.setRange(range), this.selection.strip);
     this.build();
+    let anchor: number | undefined;
     dragging(this.ruler, {
-      start: (x) => this.events.onSeek(this.timeAt(x)),
-      move: (x) => this.events.onSeek(this.timeAt(x)),
+      start: (x, { shiftKey }) => {
+        anchor = shiftKey ? this.timeAt(x) : undefined;
+        if (!shiftKey) this.events.onSeek(this.timeAt(x));
+      },
+      move: (x) => (anchor === undefined ? this.events.onSeek(this.timeAt(x)) : this.events.onSelect(anchor, this.timeAt(x))),
     });
+    byId('timeline').addEventListener('keydown', (event) => this.selectByKey(event));
     this.setUpLanes();
     new ResizeObserver(() => this.resized()).observe(this.body);
   }
@@ -97,6 +109,7 @@ export class Timeline {
       tool('plus', 'Zoom in', () => this.zoom(0.5)),
       tool('fit', 'Show all', () => this.showAll()),
       tool('lanes', 'Arrange the lanes', () => arrangeLanes(this)),
+      tool('range', 'Select a range', () => this.selectSome()),
       this.zoomText,
     );
     this.ruler.append(this.rulerCanvas);
@@ -105,7 +118,7 @@ export class Timeline {
       make('div', { class: 'timeline-row' }, tools, this.overview.element),
       make('div', { class: 'timeline-row' }, make('div', { class: 'ruler-label' }, 'Time'), this.ruler),
       this.scroller,
-      make('div', { class: 'playhead-holder', 'aria-hidden': 'true' }, this.pointerLine, this.playhead),
+      make('div', { class: 'playhead-holder', 'aria-hidden': 'true' }, this.selection.element, this.pointerLine, this.playhead),
       this.tip,
     );
   }
@@ -192,6 +205,41 @@ export class Timeline {
     this.setRange({ from: 0, to: this.duration });
   }
 
+  showSelection(range: Range | undefined): void {
+    this.selection.show(range, this.duration);
+    this.drawSelection();
+  }
+
+  private drawSelection(): void {
+    this.selection.draw({
+      width: this.width,
+      xOf: (time) => this.xOf(time),
+      timeAt: (x) => this.timeAt(x),
+    });
+  }
+
+  /// A part of what is in sight, whose edges can be dragged then.
+  private selectSome(): void {
+    const { from, to } = this.range;
+    const part = (to - from) / 4;
+    const start = Math.max(from, Math.min(this.time, to - part));
+    this.events.onSelect(start, start + part);
+  }
+
+  private selectByKey(event: KeyboardEvent): void {
+    const step = tickStep(this.range, this.width / uiScale(), 84) / 5;
+    const times: Record<string, number> = {
+      ArrowLeft: this.time - step,
+      ArrowRight: this.time + step,
+      Home: 0,
+      End: this.duration,
+    };
+    const time = times[event.key];
+    if (time === undefined || !event.shiftKey || event.ctrlKey || event.altKey || event.metaKey) return;
+    event.preventDefault();
+    this.events.onExtend(Math.max(0, Math.min(time, this.duration)));
+  }
+
   /// By a part of what is in sight.
   pan(part: number): void {
     const { from, to } = this.range;
@@ -233,6 +281,7 @@ export class Timeline {
     if (!this.session) return;
     if (this.isStale) {
       this.drawLanes();
+      this.drawSelection();
       if (this.pointed) this.point(this.pointed);
     }
     this.overview.draw(this.range, time);
@@ -327,11 +376,17 @@ export class Timeline {
   /// A click goes there; dragging moves the lanes, or the time where all of it is in sight.
   private setUpLanes(): void {
     let started: Range = this.range;
+    let anchor: number | undefined;
     const isWhole = () => started.to - started.from >= this.duration;
     dragging(this.body, {
-      start: () => void (started = this.range),
-      click: (x) => this.events.onSeek(this.timeAt(x)),
+      start: (x, { shiftKey }) => {
+        started = this.range;
+        anchor = shiftKey ? this.timeAt(x) : undefined;
+      },
+      click: (x, { shiftKey }) =>
+        shiftKey ? this.events.onSelect(this.time, this.timeAt(x)) : this.events.onSeek(this.timeAt(x)),
       move: (x, way) => {
+        if (anchor !== undefined) return this.events.onSelect(anchor, this.timeAt(x));
         if (isWhole()) return this.events.onSeek(this.timeAt(x));
         const shift = (way / this.width) * (started.to - started.from);
         this.setRange({ from: started.from - shift, to: started.to - shift });

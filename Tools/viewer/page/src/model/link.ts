@@ -1,5 +1,7 @@
-// Links into a recording: "#t=12.5&zoom=10-20&stream=cursorAction". Each part stands by itself; parts that nobody here
+// Links into a recording: "#t=12.5&range=1.5-3&zoom=10-20&stream=cursorAction". Each part stands by itself; parts that nobody here
 // knows are kept.
+
+import { decimal, decimalsOf } from './decimals';
 
 export type LinkParts = Map<string, string>;
 
@@ -25,32 +27,45 @@ export function hashOf(parts: LinkParts): string {
   return `#${[...parts].map(([name, value]) => `${name}=${coded(value)}`).join('&')}`;
 }
 
-const seconds = String.raw`\d+(?:\.\d+)?`;
+/// `hash` with these parts; one of undefined value is taken out of it.
+export function withParts(hash: string, changes: Iterable<[string, string | undefined]>): string {
+  const parts = partsOf(hash);
+  for (const [name, value] of changes) {
+    if (value === undefined) parts.delete(name);
+    else parts.set(name, value);
+  }
+  return hashOf(parts);
+}
 
 export function timeInLink(hash: string): number | undefined {
-  const text = partsOf(hash).get('t') ?? '';
-  return new RegExp(`^${seconds}$`).test(text) ? Number(text) : undefined;
+  const [time] = decimalsOf([partsOf(hash).get('t') ?? '']) ?? [];
+  return time !== undefined && time >= 0 ? time : undefined;
+}
+
+export interface TimeRange {
+  from: number;
+  to: number;
 }
 
 /// A range of time such as "10-20".
-export function rangeIn(text: string | undefined): { from: number; to: number } | undefined {
-  const [, from, to] = new RegExp(`^(${seconds})-(${seconds})$`).exec(text ?? '') ?? [];
-  return Number(from) < Number(to) ? { from: Number(from), to: Number(to) } : undefined;
+export function rangeIn(text: string | undefined): TimeRange | undefined {
+  const [from, to, ...rest] = decimalsOf(text?.split('-') ?? []) ?? [];
+  return rest.length === 0 && from !== undefined && to !== undefined && from < to ? { from, to } : undefined;
 }
 
-export function secondsText(time: number): string {
-  return String(Number(time.toFixed(6))); // a shorter one could lead to the picture before
+export function rangeText({ from, to }: TimeRange): string {
+  return `${decimal(from)}-${decimal(to)}`;
 }
 
 export function linkTo(time: number): string {
-  return hashOf(new Map([['t', secondsText(time)]]));
+  return withParts('', [['t', decimal(time)]]); // fewer digits could lead to the picture before
 }
 
 /// What the page shows, apart from what it shows by itself.
 export interface View {
   time: number;
   /// Undefined if the lanes show everything.
-  zoom: { from: number; to: number } | undefined;
+  zoom: TimeRange | undefined;
   /// Empty for all streams.
   stream: string;
   filter: string;
@@ -60,13 +75,11 @@ export interface View {
 
 /// The link to a view. What is in `hash` already and no part of a view stays in it.
 export function linkToView(hash: string, { time, zoom, stream, filter, layers }: View): string {
-  const parts = partsOf(hash);
-  const put = (name: string, value: string | undefined) =>
-    void (value === undefined ? parts.delete(name) : parts.set(name, value));
-  put('t', secondsText(time));
-  put('zoom', zoom && `${secondsText(zoom.from)}-${secondsText(zoom.to)}`);
-  put('stream', stream || undefined);
-  put('filter', filter || undefined);
-  put('layers', layers?.join(','));
-  return hashOf(parts);
+  return withParts(hash, [
+    ['t', decimal(time)],
+    ['zoom', zoom && rangeText(zoom)],
+    ['stream', stream || undefined],
+    ['filter', filter || undefined],
+    ['layers', layers?.join(',')],
+  ]);
 }

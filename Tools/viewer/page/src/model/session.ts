@@ -56,7 +56,7 @@ export interface Decoded {
   info: FileInfo;
   verify: FileCheck;
   /// What the decoder's worker has worked out already.
-  prepared?: Prepared;
+  prepared?: Prepared | undefined;
 }
 
 /// A stream that no reader finds. Nothing of it is drawn over the movie, where readers would not draw it either.
@@ -92,7 +92,8 @@ export class Session {
   private readonly clearKeys: Track | undefined;
   private readonly maskedKeys: Track | undefined;
 
-  constructor(decoded: Decoded) {
+  /// `region` is what the reader says that the movie shows.
+  constructor(decoded: Decoded, region?: Rect) {
     this.name = decoded.name;
     this.container = decoded.container;
     this.streams = decoded.streams;
@@ -108,7 +109,7 @@ export class Session {
         ? 'A later stream of its kind takes its place.'
         : 'It lies behind damage, where readers do not look.',
     }));
-    this.region = this.recordedRegion();
+    this.region = region ?? this.recordedRegion();
     this.scaleFactor = this.lastNumber('recordingScaleFactor', 'scaleFactor') ?? 1;
     const { duration } = decoded;
     this.movieDuration = duration && Number.isFinite(duration) && duration > 0 ? duration : undefined;

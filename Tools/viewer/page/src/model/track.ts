@@ -8,7 +8,7 @@ export class Track {
   readonly kind: string;
   /// Ascending and finite.
   readonly times: Float64Array;
-  /// The rows of the stream, by time; null where the stream is in that order itself.
+  /// The rows of the stream in the order of their times; null if the stream is in that order itself.
   private readonly order: Uint32Array | null;
 
   constructor(readonly entries: Table) {
