@@ -7,7 +7,7 @@ export type InsightName = 'zooms' | 'camera' | 'cursor_path' | 'activity' | 'app
 
 /// What was opened is named by the request that opened it; of all that was, `keep` closes the others.
 export type Request =
-  /// Of the text of a page; they come before it is opened.
+  /// A piece of the text of a page. All pieces come before the request that opens them.
   | { id: number; type: 'piece'; text: string }
   /// A file, or the size of the one that the pieces hold.
   | { id: number; type: 'open'; source: Blob | number; name: string; reports: boolean }
