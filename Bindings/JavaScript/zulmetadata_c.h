@@ -112,10 +112,12 @@ ZulmEntries* zulm_states(ZulmRecording* recording, const double* times, size_t c
    it. */
 ZulmEntries* zulm_insight(ZulmRecording* recording, const char* name, const char* parameters);
 
-/* Returns the streams for a movie that was cut by an edit list, which is a JSON document: one row for each, with "kind"
-   and all its "bytes". "is_copied" is 1 if the bytes are those of the recording; otherwise "moved", "carried", "added"
-   and "left_out" count its entries. */
-ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits);
+/* Returns the streams for a movie that was cut by an edit list: one row for each, with "kind" and all its "bytes".
+   "is_copied" is 1 if the bytes are those of the recording; otherwise "moved", "carried", "added" and "left_out" count
+   its entries. `edits` is the text of a list in any form that the library reads. `name` is null or the file that it
+   comes from: its extension says the form if the text does not. `frameRate` is null or such as "30000/1001", for lists
+   that count frames. */
+ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits, const char* name, const char* frameRate);
 
 void zulm_free_entries(ZulmEntries* entries);
 
@@ -123,6 +125,10 @@ size_t zulm_entry_count(const ZulmEntries* entries);
 const double* zulm_entry_times(const ZulmEntries* entries); /* seconds */
 size_t zulm_column_count(const ZulmEntries* entries);
 const ZulmColumn* zulm_column(const ZulmEntries* entries, size_t index);
+
+/* Return sentences about what is missing in states, insights and retimed streams because of the file. */
+size_t zulm_warning_count(const ZulmEntries* entries);
+const char* zulm_warning(const ZulmEntries* entries, size_t index);
 
 /* What the tool prints as JSON: the file's object of `zulm info` and of `zulm verify`, and all that `zulm dump` prints.
    `kinds` is a list separated by commas, or null for every stream. */

@@ -222,7 +222,7 @@ ExitCode runCommandLine(int argc, char** argv) {
                  "zulm");
     Action chosen;
     std::string format;
-    if (argc > 1 && std::string_view(argv[1]) == "record") // whose options are its own, --help and --json too
+    if (argc > 1 && std::string_view(argv[1]) == s_recordCommand) // whose options are its own, --help and --json too
         return becomeRecorder({argv + 2, argv + argc});
     define(app, chosen);
     app.add_option("--generate", format)->group("");

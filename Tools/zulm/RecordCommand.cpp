@@ -1,6 +1,8 @@
 #include "Tools/zulm/RecordCommand.h"
 
+#include "Tools/record/Options.h"
 #include "Tools/zulm/Command.h"
+#include "Tools/zulm/Manual.h"
 
 #include <fmt/core.h>
 
@@ -9,6 +11,7 @@
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
+#include <memory>
 #include <string>
 #include <system_error>
 #include <vector>
@@ -54,10 +57,16 @@ ExitCode becomeRecorder(const std::vector<std::string>& words) {
 }
 
 void addRecordCommand(CLI::App& app, Action& chosen) {
-    CLI::App* command = app.add_subcommand("record", "Record the screen of an X display ('zulm record --help')");
-    command->allow_extras();
-    command->callback(
-        [command, &chosen] { chosen = [words = command->remaining()] { return becomeRecorder(words); }; });
+    const auto given = std::make_shared<Recorder::GivenOptions>(); // which nobody reads: the recorder does
+    CLI::App* command = app.add_subcommand(s_recordCommand, Recorder::s_aboutRecording);
+    Recorder::addRecordingOptions(*command, *given);
+    command->footer(Recorder::s_recordingExamples);
+    command->callback([given, &chosen] {
+        chosen = [] {
+            complain("'record' must be the first word, as in 'zulm record --help'");
+            return ExitUsage;
+        };
+    });
 }
 
 } // namespace Zulm

@@ -15,10 +15,18 @@ printf '\0\0\0\20ftypmp42\0\0\0\0' >Movie.mp4
     zulm verify Movie.mp4
 } >printed.txt
 zulm view Movie.mp4 -o Movie.html
+if zulm record -o Screen.mp4 2>refused.txt || [ $? -ne 2 ]; then
+    echo "zulm record is not refused without a display" >&2
+    exit 1
+fi
+cat refused.txt >>printed.txt
+[ ! -e Screen.mp4.recording ]
+zulm record --help | grep -q -e --recover
+ls /usr/share/man/man1/zulm-record.1* >/dev/null
 grep -qx '640 0' printed.txt
 grep -q '^ *cursorLocation .* 2 ' printed.txt
 
-apt-get purge -y -qq zulm-tools libzulmetadata-dev libzulmetadata1 >/dev/null
+apt-get purge -y -qq zulm-record zulm-tools libzulmetadata-dev libzulmetadata1 >/dev/null
 if find /usr -iname '*zulm*' | grep .; then
     echo "the packages leave files behind" >&2
     exit 1

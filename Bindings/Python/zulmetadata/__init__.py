@@ -17,6 +17,7 @@ import importlib
 import json
 import os
 from collections.abc import Iterable, Iterator, Mapping
+from fractions import Fraction
 from types import TracebackType
 from typing import Any, Literal, Union, cast
 
@@ -141,7 +142,7 @@ class Recording(Mapping[Kind, _Records]):
 
     def track(self, kind: Kind) -> _Records:
         """Returns the entries of a kind with a finite time, in the order of their times. Entries at the same time keep
-        the order of the stream."""
+        the order of the stream. Raises a `KeyError` if the recording has no stream of the kind."""
         entries = self[kind]
         entries = entries[np.isfinite(entries["time"])]
         return entries[np.argsort(entries["time"], kind="stable")]
@@ -154,7 +155,8 @@ class Recording(Mapping[Kind, _Records]):
 
         A number that is not known is not-a-number, and anything else None. Buttons and modifiers are names with "+"
         between two, such as "shift+ctrl". With "linear" the cursor moves between two entries, but rests while nothing
-        was recorded; with "none" it is where the last entry says.
+        was recorded; with "none" it is where the last entry says. A stream that cannot be decoded is a `UserWarning`,
+        and nothing is known of it.
         """
         if interpolate not in ("linear", "none"):
             raise ValueError(f"interpolate is 'linear' or 'none', not {interpolate!r}")
@@ -162,17 +164,30 @@ class Recording(Mapping[Kind, _Records]):
         return _table_of(self._opened().states(asked, interpolate == "linear"))
 
     def insights(self, name: str, **parameters: float) -> _Records:
-        """Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms",
-        "cursor_path", "camera", "activity" or "applications", with one record for each. Parameters change the defaults of the C++ library, by their names in lower
-        case with underscores, such as `least=3`. Another name raises a `ValueError`."""
+        """Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path",
+        "camera", "activity" or "applications". `dtype.names` of the result lists the fields. Parameters change the
+        defaults of the C++ library, by their names in lower case with underscores, such as `least=3`. Another name
+        raises a `ValueError`. A stream that cannot be decoded is a `UserWarning`."""
         return _table_of(self._opened().insight(name, {key: float(value) for key, value in parameters.items()}))
 
-    def retime(self, edits: str | Mapping[str, Any]) -> _Records:
-        """Returns the streams for a movie that was cut by an edit list: the JSON document, or the mapping that it
-        describes. A record has the `kind` and all `bytes` of a stream. If `is_copied` is 0, `moved`, `carried`,
-        `added` and `left_out` count its entries. An impossible list raises a `ValueError`."""
-        document = edits if isinstance(edits, str) else json.dumps(edits)
-        return _table_of(self._opened().retimed(document))[
+    def retime(
+        self, edits: str | Mapping[str, Any] | os.PathLike[str], *, frame_rate: float | str | Fraction | None = None
+    ) -> _Records:
+        """Returns the streams for a movie that was cut by an edit list. `edits` is the text of a list, the mapping that
+        a JSON document describes, or the path of a file, as a `pathlib.Path`. Lists of other programs are read, too.
+        `frame_rate`, such as 25 or "30000/1001", is for those that count frames. An impossible list raises a `ValueError`.
+
+        A record has the `kind` and all `bytes` of a stream. If `is_copied` is 0, `moved`, `carried`, `added` and
+        `left_out` count its entries. A `UserWarning` says what is not in the result, such as a hidden stream."""
+        name = "edits"
+        if isinstance(edits, os.PathLike):
+            name = os.fspath(edits)
+            with open(name, "rb") as file:
+                text = file.read()
+        else:
+            text = (edits if isinstance(edits, str) else json.dumps(edits)).encode()
+        rate = "" if frame_rate is None else str(frame_rate)
+        return _table_of(self._opened().retimed(text, name, rate))[
             ["kind", "bytes", "is_copied", "moved", "carried", "added", "left_out"]
         ]
 

@@ -34,8 +34,12 @@ if(ZULM_VIEWER AND CHROMIUM)
   set_tests_properties(viewer/frames viewer/speed PROPERTIES RUN_SERIAL TRUE)
 
   # The pictures of the documentation.
+  set(recorder_setting "")
+  if(ZULMETADATA_RECORDER)
+    set(recorder_setting ZULM_RECORD=$<TARGET_FILE:zulm-record>)
+  endif()
   add_custom_target(viewer_screenshots
-    COMMAND ${CMAKE_COMMAND} -E env ${viewer_settings} ${NODE} ${viewer_tests}/screenshots.mjs
+    COMMAND ${CMAKE_COMMAND} -E env ${viewer_settings} ${recorder_setting} ${NODE} ${viewer_tests}/screenshots.mjs
       ${PROJECT_SOURCE_DIR}/Docs/viewer
     DEPENDS viewer_test_packages zulm
     VERBATIM)

@@ -47,6 +47,17 @@ export function recordedSession() {
   return { movie: join(folder, 'Recording.mp4'), page: join(folder, 'Recording.html') };
 }
 
+/// A recording of an editor and a terminal that somebody uses, with its page beside it.
+export function recordedDesktop() {
+  const movie = join(folder, 'Desktop.mp4');
+  execFileSync('python3', [join(sources, 'Tests/Tools/record/real_desktop.py'), movie], {
+    stdio: ['ignore', 'ignore', 'inherit'],
+    env: { ...process.env, ZULM_RECORD: setting('ZULM_RECORD') },
+  });
+  zulm('view', 'Desktop.mp4', '-o', 'Desktop.html');
+  return { movie, page: join(folder, 'Desktop.html') };
+}
+
 /// An hour of metadata with that many cursor positions a second, and a movie of a picture a second.
 export function longRecording(name, rate) {
   const movie = join(folder, `${name}.mp4`);
@@ -86,7 +97,7 @@ export function hugeMovie(gigabytes) {
 
 /// The page that `zulm view` wrote, without its recording.
 export function emptyPage(text) {
-  return text.replace(/<script type="application\/json" id="zulm-recording">[^<]*<\/script>\n?/, '');
+  return text.replace(/<script type="[a-z/]*" id="zulm-(recording|metadata)">[^<]*<\/script>\n?/g, '');
 }
 
 let browser;

@@ -1,23 +1,25 @@
 // The page: a recording, a player, and everything that shows where they are.
 
-import { adjustmentIn, asRecorded, isSame, shifted, withAdjustment, type Adjustment } from './adjust/adjustment';
+import { adjustmentIn, asRecorded, isSame, partsOfAdjustment, shifted, type Adjustment } from './adjust/adjustment';
 import { showAdjusting } from './adjust/dialog';
 import { Decoder } from './decoder/client';
-import { embeddedRecording, type EmbeddedRecording } from './decoder/embedded';
+import { embeddedRecording, type EmbeddedRecording, type PackedText } from './decoder/embedded';
 import { EntriesPane } from './entries/pane';
 import { showCheck, showFacts } from './facts/pane';
 import { InsightTables } from './insights/tables';
 import type { Range } from './lanes/axis';
+import { arrangeLanes } from './lanes/dialog';
 import { Timeline } from './lanes/timeline';
 import { assumption } from './model/checks';
 import { clock, shown } from './model/format';
-import { decimal, partOf, withPart } from './model/fragments';
+import { decimal } from './model/decimals';
 import { joined, type Joined } from './model/joining';
 import { markerAfter, markerBefore } from './model/markers';
 import { Session, type Decoded } from './model/session';
-import { timeInLink, linkTo } from './model/link';
+import { linkTo, linkToView, partsOf, rangeIn, rangeText, timeInLink, withParts } from './model/link';
+import { NotesPane } from './notes/pane';
 import { RangeBar } from './range/bar';
-import { rangeIn, rangeText, Selection } from './range/selection';
+import { Selection } from './range/selection';
 import { zoomStage } from './stage/handling';
 import { layers } from './stage/layers';
 import { Player } from './stage/player';
@@ -26,6 +28,7 @@ import { afterIdle } from './transport/skipping';
 import { setUpAutomation } from './ui/automation';
 import { setUpControls, type Controls } from './ui/controls';
 import { ask, setUpDialogs } from './ui/dialogs';
+import { breath } from './ui/breath';
 import { announce, byId, setText } from './ui/dom';
 import { setUpDrop } from './ui/drop';
 import { placeIcons } from './ui/icons';
@@ -59,10 +62,14 @@ export class App implements Page {
   private shownMovie = '';
   private drawnTime = -1;
   private opened = 0;
+  /// The recording whose entries are shown as the address says.
+  private linked: Session | undefined;
   finished = 0;
   private controls!: Controls;
   private readonly timeline: Timeline;
   private readonly entries: EntriesPane;
+  private readonly notes: NotesPane;
+  private readonly usualLayers = layersOn();
   private readonly rangeBar: RangeBar;
 
   constructor() {
@@ -70,8 +77,12 @@ export class App implements Page {
     this.timeline = new Timeline({
       showsKeys,
       region: () => this.stage.placement.region,
+      notes: () => this.notes.all,
       onSeek: (time) => this.seek(time),
-      onRange: () => this.rangeChanged(),
+      onRange: () => {
+        this.rangeChanged();
+        this.writeLink();
+      },
       onSelect: (one, other) => this.selection.select(one, other),
       onExtend: (time) => {
         this.selection.extend(this.player.time, time);
@@ -83,6 +94,16 @@ export class App implements Page {
       onSeek: (time) => this.seek(time),
       onSave: () => void this.save(),
       onProblem: (text) => this.complain(text),
+      onChange: () => this.writeLink(),
+    });
+    this.notes = new NotesPane({
+      time: () => this.player.time,
+      onSeek: (time) => this.seek(time),
+      onProblem: (text) => this.complain(text),
+      onChange: () => {
+        this.timeline.refreshLanes();
+        this.requestFrame();
+      },
     });
     this.rangeBar = new RangeBar(this.selection, {
       insights: (name, range) => this.insightsIn(name, range),
@@ -114,7 +135,10 @@ export class App implements Page {
       this.requestFrame();
     });
     byId('notice-close').addEventListener('click', () => void (byId('notice').hidden = true));
-    window.addEventListener('hashchange', () => this.followLink());
+    window.addEventListener('hashchange', () => {
+      this.followLink();
+      this.followLinkToEntries();
+    });
     this.player.onChange = () => this.playerChanged();
     this.player.onPicture = () => this.pictureChanged();
     this.player.skip = (time) => (this.skipsIdle ? afterIdle(this.session?.idle ?? [], time) : undefined);
@@ -162,7 +186,7 @@ export class App implements Page {
   }
 
   /// What is open stays where the new one cannot be read.
-  private async open(source: Blob | string, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
+  private async open(source: Blob | PackedText, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
     const opening = ++this.opened;
     document.body.classList.add('is-busy');
     setText(byId('welcome-title'), `Opening ${shown(name)}…`);
@@ -173,9 +197,15 @@ export class App implements Page {
       mark('zulm:decoded');
       if (decoded.streams.length === 0 && decoded.hidden.length === 0) throw new Error(whyNothing(decoded));
       byId('notice').hidden = true;
-      this.decoded = complete(decoded);
-      this.adjustment = adjustmentIn(location.hash);
-      this.show(this.adjustedSession());
+      await breath(); // each step by itself, so that the page goes on
+      if (opening !== this.opened) return;
+      const completed = complete(decoded);
+      const adjustment = adjustmentIn(location.hash);
+      const session = sessionOf(completed, adjustment);
+      await breath();
+      if (opening !== this.opened) return;
+      [this.decoded, this.adjustment] = [completed, adjustment];
+      this.show(session);
       this.decoder.keep(id);
       if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
     } catch (error) {
@@ -206,6 +236,7 @@ export class App implements Page {
     setText(byId('recording-name'), shown(session.name));
     const canHavePictures = session.container !== 'stream';
     this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration, session.movieDuration === undefined);
+    this.notes.show(session);
     this.selection.start(this.player.duration);
     this.showSession(session);
     this.stage.zoom.reset();
@@ -217,8 +248,7 @@ export class App implements Page {
   }
 
   private adjustedSession(): Session {
-    const { decoded, adjustment } = this;
-    return new Session(shifted(decoded!, adjustment.offset), adjustment.region);
+    return sessionOf(this.decoded!, this.adjustment);
   }
 
   private showSession(session: Session): void {
@@ -258,6 +288,7 @@ export class App implements Page {
   private showDetails(session: Session): void {
     if (session !== this.session) return;
     this.entries.show(session);
+    this.followLinkToEntries();
     showFacts(session, this.player.duration, this.adjustment, {
       onAdjust: () =>
         showAdjusting(this.adjustment, {
@@ -310,15 +341,21 @@ export class App implements Page {
     this.timeline.pan(part);
   }
 
+  /// Parts that the address lacks change nothing.
   private followLink(): void {
-    const time = timeInLink(location.hash);
     if (!this.session) return;
+    const parts = partsOf(location.hash);
+    if (parts.has('offset') || parts.has('region')) this.adjust(adjustmentIn(location.hash));
+    const zoom = rangeIn(parts.get('zoom'));
+    if (zoom) this.timeline.setRange(zoom);
+    const time = timeInLink(location.hash);
     if (time !== undefined && Math.abs(time - this.player.time) > 0.0005) this.seek(time);
-    const { hash } = location;
-    if (partOf(hash, 'offset') ?? partOf(hash, 'region')) this.adjust(adjustmentIn(hash));
-    const text = partOf(hash, 'range');
-    const range = rangeIn(text);
-    if (range && text !== this.rangeInLink()) this.selection.select(range.from, range.to);
+    const wanted = parts.get('layers')?.split(',');
+    if (wanted) for (const layer of layers) layer.isOn = wanted.includes(layer.id);
+    const range = rangeIn(parts.get('range'));
+    if (range && parts.get('range') !== this.rangeInLink()) this.selection.select(range.from, range.to);
+    this.controls.showState();
+    this.requestFrame();
   }
 
   private rangeInLink(): string | undefined {
@@ -328,12 +365,26 @@ export class App implements Page {
 
   /// The address of what is shown, after "#".
   private link(): string {
-    return withAdjustment(withPart(linkTo(this.player.time), 'range', this.rangeInLink()), this.adjustment);
+    const on = layersOn();
+    const others = withParts(location.hash, [['range', this.rangeInLink()], ...partsOfAdjustment(this.adjustment)]);
+    return linkToView(others, {
+      time: this.player.time,
+      zoom: this.timeline.zoomed,
+      stream: this.entries.chosenStream,
+      filter: this.entries.filterText,
+      layers: on.join() === this.usualLayers.join() ? undefined : on,
+    });
   }
 
-  /// The address tells the time, but not sixty times a second: browsers allow few changes.
+  private followLinkToEntries(): void {
+    const parts = partsOf(location.hash);
+    this.entries.look(parts.get('stream'), parts.get('filter'));
+    this.linked = this.session;
+  }
+
+  /// The address tells what is shown, but not sixty times a second: browsers allow few changes.
   private writeLink = debounced(() => {
-    if (!this.session || this.player.playing) return;
+    if (!this.session || this.linked !== this.session || this.player.playing) return;
     const link = this.link();
     if (link !== location.hash) history.replaceState(null, '', link);
   }, 300);
@@ -346,6 +397,7 @@ export class App implements Page {
     layer.isOn = !layer.isOn;
     this.controls.showState();
     announce(`${layer.name} ${layer.isOn ? 'shown' : 'hidden'}`);
+    this.writeLink();
     this.requestFrame();
   }
 
@@ -356,6 +408,15 @@ export class App implements Page {
     this.timeline.invalidate();
     announce(this.stage.showsKeys ? 'Keys are shown' : 'Keys are masked');
     this.requestFrame();
+  }
+
+  arrangeLanes(): void {
+    arrangeLanes(this.timeline);
+  }
+
+  writeNote(): void {
+    showTab('tab-notes');
+    this.notes.focusField();
   }
 
   findEntries(): void {
@@ -513,6 +574,10 @@ export class App implements Page {
   }
 }
 
+function sessionOf(decoded: Decoded, { offset, region }: Adjustment): Session {
+  return new Session(shifted(decoded, offset), region);
+}
+
 /// A page writes names in addresses with percent signs.
 function decodedName(name: string): string {
   try {
@@ -533,6 +598,10 @@ function wordsOf(error: unknown, name = ''): string {
   const words = (error instanceof Error ? error.message : String(error)).replace(/\.$/, '');
   const clause = name && words.startsWith(`${name}: `) ? words.slice(name.length + 2) : words;
   return /^(begins|is) /.test(clause) ? `it ${clause}` : clause;
+}
+
+function layersOn(): string[] {
+  return layers.filter(({ isOn }) => isOn).map(({ id }) => id);
 }
 
 const firstAtoms = /^(ftyp|mdat|moov|free|skip|wide|RIFF)$/;

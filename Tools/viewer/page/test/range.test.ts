@@ -1,17 +1,16 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
-import { adjustmentIn, asRecorded, shiftedTable, withAdjustment } from '../src/adjust/adjustment';
-import { decimal, partOf, withPart } from '../src/model/fragments';
+import { adjustmentIn, asRecorded, partsOfAdjustment, shiftedTable } from '../src/adjust/adjustment';
+import { decimal } from '../src/model/decimals';
 import { joined } from '../src/model/joining';
+import { rangeIn, rangeText, withParts } from '../src/model/link';
 import { concatListOf, editListOf } from '../src/range/exports';
-import { rangeIn, rangeText, Selection } from '../src/range/selection';
+import { Selection } from '../src/range/selection';
 
 test('parts of a link are set, replaced and taken away, and others stay', () => {
-  assert.equal(partOf('#t=3&range=1-2', 'range'), '1-2');
-  assert.equal(partOf('#t=3', 'range'), undefined);
-  assert.equal(withPart('#t=3', 'range', '1-2'), '#t=3&range=1-2');
-  assert.equal(withPart('#range=5-6&t=3&other', 'range', '1-2'), '#t=3&other&range=1-2');
-  assert.equal(withPart('#range=5-6', 'range', undefined), '');
+  assert.equal(withParts('#t=3', [['range', '1-2']]), '#t=3&range=1-2');
+  assert.equal(withParts('#range=5-6&t=3&other=', [['range', '1-2']]), '#range=1-2&t=3&other=');
+  assert.equal(withParts('#range=5-6&t=3', [['range', undefined]]), '#t=3');
 });
 
 test('numbers are written without an exponent and without digits that say nothing', () => {
@@ -61,7 +60,7 @@ test('lists for other programs hold exact times and any name', () => {
 
 test('an adjustment is read from a link as it was written', () => {
   const adjustment = { offset: -12.5, region: { x: -1920, y: 0, width: 1280, height: 720 } };
-  assert.equal(withAdjustment('#t=1', adjustment), '#t=1&offset=-12.5&region=-1920,0,1280,720');
+  assert.equal(withParts('#t=1', partsOfAdjustment(adjustment)), '#t=1&offset=-12.5&region=-1920,0,1280,720');
   assert.deepEqual(adjustmentIn('#t=1&offset=-12.5&region=-1920,0,1280,720'), adjustment);
   for (const hash of ['', '#offset=x', '#region=1,2,3', '#region=0,0,0,5']) assert.deepEqual(adjustmentIn(hash), asRecorded);
 });

@@ -1,8 +1,10 @@
 // What the reader says about a movie that is not the one that was recorded: it was cut, or it shows another region.
 
 import type { StreamSummary, Table } from '#decoder';
-import { decimal, decimalsOf, partOf, withPart } from '../model/fragments';
+import { decimal, decimalsOf } from '../model/decimals';
 import { hasArea, type Rect } from '../model/geometry';
+import { partsOf } from '../model/link';
+import type { Prepared } from '../model/prepared';
 import type { Decoded } from '../model/session';
 
 export interface Adjustment {
@@ -22,17 +24,22 @@ export function regionOf(numbers: number[] | undefined): Rect | undefined {
 }
 
 export function adjustmentIn(hash: string): Adjustment {
-  const [offset] = decimalsOf([partOf(hash, 'offset') ?? '0']) ?? [0];
-  return { offset: offset!, region: regionOf(decimalsOf(partOf(hash, 'region')?.split(',') ?? [])) };
+  const parts = partsOf(hash);
+  const [offset] = decimalsOf([parts.get('offset') ?? '0']) ?? [0];
+  return { offset: offset!, region: regionOf(decimalsOf(parts.get('region')?.split(',') ?? [])) };
 }
 
-export function withAdjustment(hash: string, { offset, region }: Adjustment): string {
+/// For a link.
+export function partsOfAdjustment({ offset, region }: Adjustment): [string, string | undefined][] {
   const numbers = region && [region.x, region.y, region.width, region.height].map(decimal).join();
-  return withPart(withPart(hash, 'offset', offset === 0 ? undefined : decimal(offset)), 'region', numbers);
+  return [
+    ['offset', offset === 0 ? undefined : decimal(offset)],
+    ['region', numbers],
+  ];
 }
 
 export function isSame(one: Adjustment, other: Adjustment): boolean {
-  return withAdjustment('', one) === withAdjustment('', other);
+  return partsOfAdjustment(one).join() === partsOfAdjustment(other).join();
 }
 
 /// Columns of insights that hold times.
@@ -54,11 +61,16 @@ function shiftedSummary(stream: StreamSummary, offset: number): StreamSummary {
   return { ...stream, first: first + offset, last: last + offset };
 }
 
+function shiftedParts(prepared: Prepared, offset: number): Prepared {
+  const { times, values } = prepared.speed;
+  return { ...prepared, speed: { times: times.map((time) => time + offset), values } };
+}
+
 /// Everything at the times of the movie.
 export function shifted(decoded: Decoded, offset: number): Decoded {
   if (offset === 0) return decoded;
   const moved = <Kind extends Table>(table: Kind | undefined) => table && shiftedTable(table, offset);
-  const { keys } = decoded;
+  const { keys, prepared } = decoded;
   return {
     ...decoded,
     streams: decoded.streams.map((stream) => shiftedSummary(stream, offset)),
@@ -67,6 +79,7 @@ export function shifted(decoded: Decoded, offset: number): Decoded {
     clicks: moved(decoded.clicks),
     idle: moved(decoded.idle),
     appearances: moved(decoded.appearances),
+    prepared: prepared && shiftedParts(prepared, offset),
     hidden: decoded.hidden.map(({ stream, entries }) => ({
       stream: shiftedSummary(stream, offset),
       entries: moved(entries),

@@ -1,7 +1,7 @@
 // The dialog in which a reader says how the recording belongs to the movie.
 
-import { decimal, decimalsOf } from '../model/fragments';
-import { fill } from '../ui/dialogs';
+import { decimal, decimalsOf } from '../model/decimals';
+import { fillDialog } from '../ui/dialogs';
 import { byId, make } from '../ui/dom';
 import { asRecorded, regionOf, type Adjustment } from './adjustment';
 
@@ -46,7 +46,7 @@ export function showAdjusting({ offset, region }: Adjustment, events: AdjustEven
     if (written) finish(written);
   });
   form.addEventListener('input', () => [offsetField, ...regionFields].forEach((input) => input.setCustomValidity('')));
-  fill(dialog, 'adjust-title', 'How the recording belongs to the movie', form);
+  fillDialog(dialog, 'adjust-title', 'How the recording belongs to the movie', form);
   dialog.showModal();
 }
 

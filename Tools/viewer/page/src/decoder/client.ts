@@ -2,7 +2,10 @@
 
 import type { Table } from '#decoder';
 import type { Decoded } from '../model/session';
+import type { PackedText } from './embedded';
+import { piecesOf } from './packed';
 import type { InsightName, Reply, Request } from './protocol';
+import { unwrapped } from './wire';
 import DecoderWorker from './worker?worker&inline';
 
 type Wish = Request extends infer One ? (One extends Request ? Omit<One, 'id'> : never) : never;
@@ -20,11 +23,13 @@ export class Decoder {
     this.running();
   }
 
-  /// A file is read in slices, as far as needed; a text is the file itself in base64, whose reports are known.
-  async open(source: Blob | string, name: string): Promise<{ id: number; decoded: Decoded; problems: string[] }> {
-    const reply = await this.ask({ type: 'open', source, name, reports: typeof source !== 'string' });
+  /// A file is read in slices, as far as needed; a text holds the file itself, whose reports are known.
+  async open(source: Blob | PackedText, name: string): Promise<{ id: number; decoded: Decoded; problems: string[] }> {
+    const isFile = source instanceof Blob;
+    if (!isFile) for (const text of piecesOf(source.text)) this.running().postMessage({ type: 'piece', id: 0, text });
+    const reply = await this.ask({ type: 'open', source: isFile ? source : source.size, name, reports: isFile });
     if (reply.type !== 'opened') throw new DecoderError('the decoder answered something else');
-    return reply;
+    return { ...reply, decoded: unwrapped(reply.decoded) };
   }
 
   /// What was opened under this number is what the page shows from now on; without one it stays what it was. Frees

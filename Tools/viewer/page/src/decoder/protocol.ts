@@ -7,7 +7,10 @@ export type InsightName = 'zooms' | 'camera' | 'cursor_path' | 'activity' | 'app
 
 /// What was opened is named by the request that opened it; of all that was, `keep` closes the others.
 export type Request =
-  | { id: number; type: 'open'; source: Blob | string; name: string; reports: boolean }
+  /// Of the text of a page; they come before it is opened.
+  | { id: number; type: 'piece'; text: string }
+  /// A file, or the size of the one that the pieces hold.
+  | { id: number; type: 'open'; source: Blob | number; name: string; reports: boolean }
   | { id: number; type: 'keep'; opened: number }
   | { id: number; type: 'dump'; opened: number }
   | { id: number; type: 'insights'; opened: number; name: InsightName; parameters: Record<string, number> };

@@ -4,7 +4,7 @@ import type { StreamSummary } from '#decoder';
 import type { Adjustment } from '../adjust/adjustment';
 import { doubtsAbout } from '../model/checks';
 import { brief, bytes, clock, count, memoryText, plural, shown, titleOf } from '../model/format';
-import { decimal } from '../model/fragments';
+import { decimal } from '../model/decimals';
 import type { Size } from '../model/geometry';
 import { idleTime } from '../model/idle';
 import type { Finding, Session } from '../model/session';

@@ -5,7 +5,6 @@ import { fitCanvas, make } from '../ui/dom';
 import { palette } from '../ui/palette';
 import { uiScale } from '../ui/scale';
 import { clampedRange, type Range } from './axis';
-import { Extremes } from './extremes';
 import { dragging } from './gestures';
 import { drawArea, LaneCanvas, type Curve } from './lane';
 
@@ -40,8 +39,7 @@ export class Overview {
 
   show(session: Session, duration: number): void {
     if (session !== this.session) {
-      const { times, values } = session.speed;
-      this.curve = { times, extremes: new Extremes(values.map(Math.sqrt)), low: 0, high: 70 };
+      this.curve = { times: session.speed.times, extremes: session.speedExtremes, low: 0, high: 4900, shape: Math.sqrt };
     }
     [this.session, this.duration, this.isStale] = [session, duration, true];
   }

@@ -3,7 +3,7 @@
 import type { Table } from '#decoder';
 import { copyText } from '../entries/copy';
 import { clock, count, plural } from '../model/format';
-import { decimal } from '../model/fragments';
+import { decimal } from '../model/decimals';
 import { Track } from '../model/track';
 import { announce, byId, make, setText } from '../ui/dom';
 import { setIcon } from '../ui/icons';

@@ -1,6 +1,6 @@
 // A selected range for other programs: an edit list of zulm, and a list for the concat demuxer of ffmpeg.
 
-import { decimal } from '../model/fragments';
+import { decimal } from '../model/decimals';
 import type { Range } from '../lanes/axis';
 
 /// As `zulm cut --edits` and `zulm retime --edits` read it. Texts are exact.

@@ -1,6 +1,5 @@
 // The range of time that the reader has selected.
 
-import { decimal, decimalsOf } from '../model/fragments';
 import type { Range } from '../lanes/axis';
 
 const shortest = 0.001; // seconds
@@ -62,14 +61,4 @@ export class Selection {
     if (!this.selected) [this.loops, this.hasHeat] = [false, false];
     this.onChange();
   }
-}
-
-/// As a part of a link: "1.5-3".
-export function rangeText({ from, to }: Range): string {
-  return `${decimal(from)}-${decimal(to)}`;
-}
-
-export function rangeIn(text: string | undefined): Range | undefined {
-  const times = decimalsOf(text?.split('-') ?? []);
-  return times?.length === 2 && times[1]! > times[0]! ? { from: times[0]!, to: times[1]! } : undefined;
 }

@@ -14,6 +14,8 @@ const keys: [string, string][] = [
   ['Home End', 'To the start or the end'],
   ['+ − 0', 'Zoom the lanes in or out, show all'],
   ['< >', 'Move the lanes back or on'],
+  ['a', 'Arrange the lanes: hide, move, resize, pin'],
+  ['b', 'Write a note at the playhead'],
   ['/', 'Filter the entries'],
   ['n N', 'Next or previous match'],
   ['Ctrl C', 'Copy the selected entries as CSV; Esc selects none'],
@@ -34,9 +36,10 @@ const gestures: [string, string][] = [
   ['Wheel', 'Scroll; with Ctrl zoom the lanes at the pointer, with Shift move them'],
   ['Drag', 'Move the lanes, or the playhead where all is in sight'],
   ['Click', 'Go there, in a lane or in the table'],
+  ['Drag', 'The name of a lane to another place, or the edge below it to another height'],
+  ['Link', 'The address holds the time, the range, the zoom, the stream, the filter and the layers'],
   ['Shift drag', 'Select a range of time, in the lanes or the ruler'],
   ['Ctrl wheel', 'Over the movie: zoom it; drag moves it then'],
-  ['Link', 'Add #t=12.5 to the address to open at a time, and &range=1.5-3 to select'],
 ];
 
 function rows(entries: [string, string][]): HTMLElement {
@@ -50,7 +53,7 @@ function rows(entries: [string, string][]): HTMLElement {
   );
 }
 
-export function fill(dialog: HTMLDialogElement, id: string, title: string, ...content: Node[]): void {
+export function fillDialog(dialog: HTMLDialogElement, id: string, title: string, ...content: Node[]): void {
   const close = make('button', { type: 'button', class: 'button is-icon', 'aria-label': 'Close' });
   setIcon(close, 'close');
   close.addEventListener('click', () => dialog.close());
@@ -98,8 +101,8 @@ function aboutContent(): Node[] {
 export function setUpDialogs(): void {
   const help = byId<HTMLDialogElement>('help-dialog');
   const about = byId<HTMLDialogElement>('about-dialog');
-  fill(help, 'help-title', 'Keys and gestures', rows(keys), make('h3', {}, 'Pointer'), rows(gestures));
-  fill(about, 'about-title', 'About this page', ...aboutContent());
+  fillDialog(help, 'help-title', 'Keys and gestures', rows(keys), make('h3', {}, 'Pointer'), rows(gestures));
+  fillDialog(about, 'about-title', 'About this page', ...aboutContent());
   byId('help-button').addEventListener('click', showHelp);
   byId('about-button').addEventListener('click', () => about.showModal());
 }
@@ -120,7 +123,7 @@ export function ask(title: string, text: string, yes: string): Promise<boolean> 
       });
       return element;
     };
-    fill(
+    fillDialog(
       dialog,
       'confirm-title',
       title,

@@ -24,6 +24,8 @@ export function setUpKeys(page: Page): void {
     '0': () => page.zoom(0),
     '<': () => page.pan(-0.25),
     '>': () => page.pan(0.25),
+    a: () => page.arrangeLanes(),
+    b: () => page.writeNote(),
     '/': () => page.findEntries(),
     n: () => page.stepMatch(1),
     N: () => page.stepMatch(-1),

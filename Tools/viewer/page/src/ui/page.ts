@@ -28,6 +28,8 @@ export interface Page {
   switchLayer(id: string): void;
   switchKeys(): void;
   findEntries(): void;
+  arrangeLanes(): void;
+  writeNote(): void;
   /// 0 shows the whole picture.
   zoomMovie(factor: number): void;
   switchLoop(): void;
