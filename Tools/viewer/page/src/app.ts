@@ -46,7 +46,7 @@ export class App implements Page {
   readonly selection = new Selection();
   skipsIdle = false;
   private readonly insights = new InsightTables({
-    ask: (name, parameters) => this.decoder.insights(name, parameters),
+    ask: async (name, parameters) => (await this.decoder.insights({ name, parameters }))[0]!,
     onLoaded: () => this.requestFrame(),
     onProblem: (text) => this.complain(text),
   });
@@ -106,7 +106,7 @@ export class App implements Page {
       },
     });
     this.rangeBar = new RangeBar(this.selection, {
-      insights: (name, range) => this.insightsIn(name, range),
+      insights: (range) => this.insightsIn(range),
       movieName: () => this.fileName(),
       link: () => location.href.replace(/#.*/, '') + this.link(),
       onZoom: (range) => this.timeline.setRange(range),
@@ -446,9 +446,10 @@ export class App implements Page {
   }
 
   /// The range is one of the movie.
-  private insightsIn(name: 'activity' | 'applications', { from, to }: Range): ReturnType<Decoder['insights']> {
+  private insightsIn({ from, to }: Range): ReturnType<Decoder['insights']> {
     const { offset } = this.adjustment;
-    return this.decoder.insights(name, { start: from - offset, end: to - offset });
+    const parameters = { start: from - offset, end: to - offset };
+    return this.decoder.insights({ name: 'activity', parameters }, { name: 'applications', parameters });
   }
 
   switchLoop(): void {

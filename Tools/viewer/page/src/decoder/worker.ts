@@ -124,8 +124,9 @@ async function answer(request: Exclude<Request, { type: 'piece' }>): Promise<[Re
   if (request.type === 'dump')
     return [{ id, type: 'dumped', text: await using(request.opened, (recording) => recording.dump()) }, []];
   if (request.type === 'insights') {
-    const { opened, name, parameters } = request;
-    return [{ id, type: 'computed', table: await using(opened, (recording) => recording.insights(name, parameters)) }, []];
+    const { opened, asked } = request;
+    const compute = (recording: Recording) => asked.map(({ name, parameters }) => recording.insights(name, parameters));
+    return [{ id, type: 'computed', tables: await using(opened, compute) }, []];
   }
   const { source, name, reports } = request;
   recordings.set(id, reopening(source, name));

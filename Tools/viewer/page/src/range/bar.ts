@@ -13,8 +13,8 @@ import type { Range } from '../lanes/axis';
 import type { Selection } from './selection';
 
 export interface RangeEvents {
-  /// Asks the library about a range of the movie's time.
-  insights: (name: 'activity' | 'applications', range: Range) => Promise<Table>;
+  /// Asks the library about the activity and the applications in a range of the movie's time.
+  insights: (range: Range) => Promise<Table[]>;
   movieName: () => string;
   link: () => string;
   onZoom: (range: Range) => void;
@@ -32,6 +32,7 @@ export class RangeBar {
   private readonly heat: HTMLButtonElement;
   private timer: ReturnType<typeof setTimeout> | undefined;
   private asked = 0;
+  private isAsking = false;
   /// Lines of a name and a value.
   private lines: [string, string][] = [];
   private told: Range | undefined;
@@ -103,17 +104,19 @@ export class RangeBar {
     this.told = undefined;
   }
 
+  /// One question at a time: while the library works, only the last selection counts.
   private async ask(range: Range, asked: number): Promise<void> {
+    if (this.isAsking) return;
+    this.isAsking = true;
     try {
-      const tables = await Promise.all([
-        this.events.insights('activity', range),
-        this.events.insights('applications', range),
-      ]);
+      const tables = await this.events.insights(range);
       if (asked === this.asked) this.tell(...(tables.map((table) => new Track(table)) as [Track, Track]));
     } catch (error) {
       if (asked === this.asked) this.events.onProblem(`The selection cannot be looked at: ${error instanceof Error ? error.message : error}.`);
     } finally {
+      this.isAsking = false;
       if (asked === this.asked) this.element.classList.remove('is-asking');
+      else if (this.told) void this.ask(this.told, this.asked);
     }
   }
 
