@@ -80,8 +80,13 @@ export class NotesPane {
 
   private change(notes: Note[], told: string): void {
     this.notes = sortedNotes(notes);
-    store(this.key, notes.length > 0 ? notesText(this.notes, this.session?.name ?? '', 'json') : null);
     this.fill();
+    this.keep(told);
+  }
+
+  private keep(told: string): void {
+    const { notes } = this;
+    store(this.key, notes.length > 0 ? notesText(notes, this.session?.name ?? '', 'json') : null);
     announce(told);
     this.events.onChange();
   }
@@ -113,10 +118,11 @@ export class NotesPane {
     return make('li', {}, time, field, remove);
   }
 
-  /// An empty note is none.
+  /// An empty note is removed. Any other keeps its element: the button that the reader presses next has to stay there.
   private rewrite(note: Note, text: string): void {
-    const others = this.notes.filter((other) => other !== note);
-    this.change(text ? [...others, { ...note, text }] : others, text ? 'Note changed' : 'Note removed');
+    if (!text) return this.change(this.notes.filter((other) => other !== note), 'Note removed');
+    note.text = text;
+    this.keep('Note changed');
   }
 
   private save(format: NotesFormat, type: string): void {
