@@ -153,6 +153,7 @@ def seeds(streams):
     yield "fragmented_movie", list(fragmented_movies())
     yield "uuid_text", [text.encode() for text in IDENTIFIERS]
     yield "image_decode", list(pictures())
+    yield "recording", all_movies + all_riffs + bare
     yield from edit_list_seeds.seeds()
     files = [(0, movie) for movie in all_movies[:3]] + [(1, all_riffs[0])]
     files += [(2, streams[kind]) for kind in ("cursorImage", "keyboardAction", "slideTitles", "systemData")]

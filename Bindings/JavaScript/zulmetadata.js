@@ -274,11 +274,12 @@ export class Recording {
   }
 
   track(kind) {
-    const { time, columns } = this.entries(kind);
+    const entries = this.entries(kind);
+    const { time, columns } = entries;
+    if (time.every((value, row) => Number.isFinite(value) && !(value < time[row - 1]))) return entries;
     const rows = Uint32Array.from(time.keys()).filter((row) => Number.isFinite(time[row]));
     rows.sort((a, b) => time[a] - time[b] || a - b);
-    const ordered = (values) => Array.from(rows, (row) => values[row]);
-    const sorted = (values) => (Array.isArray(values) ? ordered(values) : values.constructor.from(ordered(values)));
+    const sorted = (values) => values.constructor.from(rows, (row) => values[row]);
     return {
       kind,
       time: sorted(time),

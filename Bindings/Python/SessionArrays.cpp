@@ -26,10 +26,17 @@ py::object columnOf(const std::vector<Number>& numbers) {
     return py::array_t<Number>(static_cast<py::ssize_t>(numbers.size()), numbers.data());
 }
 
+/// Equal texts that follow one another share one object: a title holds for many rows.
 py::object columnOf(const std::vector<Text>& texts) {
     py::list column;
-    for (const Text& text : texts)
-        column.append(text ? py::object(pythonText(*text)) : py::none());
+    py::object shared = py::none();
+    const Text* last = nullptr;
+    for (const Text& text : texts) {
+        if (!last || text != *last)
+            shared = text ? py::object(pythonText(*text)) : py::none();
+        last = &text;
+        column.append(shared);
+    }
     return column;
 }
 

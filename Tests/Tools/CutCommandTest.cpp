@@ -288,6 +288,25 @@ TEST_F(CutCommand, CutsMoviesWithoutSound) {
     EXPECT_EQ(outputOf("ffprobe -v error -select_streams a -show_entries stream=index -of csv=p=0 " + out), "");
 }
 
+TEST_F(CutCommand, CutsMoviesOfOneFrame) {
+    const std::string still = folder / "still.mp4";
+    outputOf("ffmpeg -v error -f lavfi -i color=white:s=64x48:r=1/20 -frames:v 1 -c:v libx264 " + still);
+    writeFile(still, contentsOf(still) + zulmAtom({locationStream()}));
+    const std::vector<std::pair<std::vector<std::string>, double>> lengths{
+        {{"--keep", "0-4"}, 4},
+        {{"--keep", "5-9", "--keep", "1-2"}, 5},
+        {{"--keep", "1-4@2", "--keep", "2-19", "--keep", "0-1@1/2"}, 20.5}};
+    for (const auto& [edits, length] : lengths) {
+        std::vector<std::string> arguments = edits;
+        arguments.push_back("--force");
+        const ToolResult result = cut(still, arguments);
+        EXPECT_EQ(result.errors, "");
+        EXPECT_NEAR(lengthOf("v:0"), length, 0.0005);
+        EXPECT_NEAR(std::stod(outputOf("ffprobe -v error -show_entries format=duration -of csv=p=0 " + out)), length,
+                    0.0005);
+    }
+}
+
 TEST_F(CutCommand, KeepsTurnedMoviesTurned) {
     ASSERT_EQ(cut(movie("turned"), {"--keep", "2-3", "--keep", "6-7@2"}).exitCode, 0);
     expectFramesOf(movie("turned"), {{2, 3, 1}, {6, 7, 2}}, s_height, s_width);

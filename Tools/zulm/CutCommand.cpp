@@ -72,7 +72,7 @@ EditList madeMovie(const CutOptions& options, const InputFile& input, const Edit
 
 ExitCode cutRecording(const CutOptions& options, RunReport& report) {
     const InputFile input(options.recording);
-    const Recording recording = openSession(input);
+    const Recording recording = input.openSession();
     if (recording.container() == Container::RawStream)
         throw Failure(fmt::format("{}: is a stream alone, without a movie that could be cut", options.recording));
     const EditList edits = editsOf(options.edits, recording);

@@ -1,5 +1,6 @@
 #include "Tools/zulm/PackedBytes.h"
 
+#define ZLIB_CONST // it only reads what it compresses
 #include <zlib.h>
 
 #include <algorithm>

@@ -108,7 +108,7 @@ void print(const RetimeOptions& options, const RetimedStreams& streams, const At
 
 ExitCode retimeRecording(const RetimeOptions& options, RunReport& report) {
     const InputFile input(options.recording);
-    const Recording recording = openSession(input);
+    const Recording recording = input.openSession();
     const EditList edits = editsOf(options.edits, recording);
     if (recording.streams().empty())
         return complainAboutNoStreams(recording);

@@ -42,6 +42,12 @@ private:
     bool containsEnd_;
 };
 
+/// Unlike `std::hypot`, equal on every machine.
+double distanceBetween(const ScreenPoint& left, const ScreenPoint& right) {
+    const ScreenPoint way{right.x - left.x, right.y - left.y};
+    return std::sqrt(way.x * way.x + way.y * way.y);
+}
+
 double distanceIn(const Track<CursorLocationKind>& positions, const SpanWithin& span) {
     const double usual = usualDistance(positions.times());
     const auto placeAt = [&](double time) { return cursorPositionAt(positions, time, Interpolation::Linear, usual); };
@@ -49,7 +55,7 @@ double distanceIn(const Track<CursorLocationKind>& positions, const SpanWithin& 
     double distance = 0;
     const auto moveTo = [&](const ScreenPoint& place) {
         if (before)
-            distance += std::hypot(place.x - before->x, place.y - before->y);
+            distance += distanceBetween(*before, place);
         before = place;
     };
     const std::span<const double> times = positions.times();

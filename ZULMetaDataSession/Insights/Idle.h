@@ -1,6 +1,6 @@
 #pragma once
 
-// The times at which nobody used the machine.
+// When the person at the machine did nothing.
 //
 //     for (const IdleSpan& span : idleSpansOf(positions, actions, keys, scrolling, duration))
 //         std::cout << "idle from " << span.start << " s to " << span.end << " s\n";

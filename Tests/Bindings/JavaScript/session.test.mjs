@@ -64,6 +64,21 @@ test('has the entries of a kind in the order of their times', () => {
   assert.ok(time.every((value, index) => index === 0 || value >= time[index - 1]));
 });
 
+test('orders a track by time, and leaves out entries at no time', async () => {
+  const stream = new Uint8Array(24 + 4 * 16);
+  stream.set(Buffer.from('2b7b6af27a1f11e283d00017f200be7f', 'hex'));
+  const view = new DataView(stream.buffer);
+  view.setInt32(16, 1, true);
+  view.setInt32(20, 16, true);
+  [2, NaN, 1, 1].forEach((time, row) => {
+    view.setFloat64(24 + 16 * row, time, true);
+    view.setInt32(32 + 16 * row, row, true);
+  });
+  const { time, columns } = (await Recording.open(stream, 'a.dat')).track('cursorLocation');
+  assert.deepEqual(time, Float64Array.of(1, 1, 2));
+  assert.deepEqual(columns.x, Int32Array.of(2, 3, 0));
+});
+
 test('takes one time, and stays open after a wrong argument', () => {
   assert.deepEqual(recording.at(3), recording.at([3]));
   assert.throws(() => recording.at(undefined), TypeError);

@@ -114,6 +114,13 @@ def test_a_track_is_in_the_order_of_its_times(tmp_path):
         assert recording.at([]).size == 0
 
 
+def test_a_text_that_holds_is_one_object(tmp_path):
+    file = tmp_path / "a.dat"
+    zulmetadata.write_stream(file, "topmostAppName", [(0, "Editor"), (3, "Browser")])
+    first, second, third = zulmetadata.Recording(file).at([1, 2, 3])["application"]
+    assert first == "Editor" and first is second and third == "Browser"
+
+
 def test_what_cannot_be_asked_is_refused(tmp_path):
     file = tmp_path / "a.dat"
     zulmetadata.write_stream(file, "cursorLocation", [(2, 5, 6)])

@@ -8,9 +8,10 @@ import time
 from check import Result
 from Checks.screen_sync import use_desk
 
-MOST = 2.0     # percent of a core, at 1280x720 and 30 frames a second
-SHARED = 2     # times as much in the quick form, which shares its machine with others
-GROWTH = 4096  # KiB that the memory may grow by after the first tenth
+MOST = 2.0  # percent of a core, at 1280x720 and 30 frames a second
+SHARED = 2  # times as much in the quick form, which shares its machine with others
+PICTURE = 1280 * 720 * 3 // 2 // 1024  # KiB
+GROWTH = 1024 + 10 * PICTURE  # KiB: pictures wait for a busy encoder, whose memory is kept for the next ones
 MOTIONS = [word for index in range(50) for word in ("mousemove", 300 + 7 * index, 200 + 3 * index, "sleep", 0.02)]
 
 

@@ -83,8 +83,11 @@ public:
             draw();
             std::fflush(stdout);
             poll(waits.data(), waits.size(), 1000);
-            if ((waits[1].revents & (POLLIN | POLLHUP)) != 0)
+            if ((waits[1].revents & (POLLIN | POLLHUP)) == 0)
+                continue;
+            do { // several lines may have come at once
                 readLine();
+            } while (!isOver_ && std::cin.rdbuf()->in_avail() > 0);
         }
     }
 
@@ -271,6 +274,7 @@ private:
 
 /// ShownWindow X Y WIDTH HEIGHT [unmanaged]
 int main(int argc, char** argv) {
+    std::ios::sync_with_stdio(false); // so that it knows of lines that it has read ahead
     constexpr int geometry = 5;
     if (argc < geometry)
         return 2;

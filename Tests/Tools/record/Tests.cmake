@@ -10,9 +10,7 @@ if(ZULMETADATA_RECORDER)
   set(record_programs ZULM_RECORD=$<TARGET_FILE:zulm-record> SHOWN_WINDOW=$<TARGET_FILE:ShownWindow> ZULM=${ZULM_PATH})
 
   zulm_add_tests(RecorderTests FragmentedMovieTest InstantTest ScrollAxisTest)
-  target_sources(RecorderTests PRIVATE
-    ${PROJECT_SOURCE_DIR}/Tools/record/Boxes.cpp ${PROJECT_SOURCE_DIR}/Tools/record/FragmentedMovie.cpp)
-  target_link_libraries(RecorderTests PRIVATE ${ZULMETADATA_FMT_TARGET})
+  target_link_libraries(RecorderTests PRIVATE zulm_fragmented_movie)
 else()
   set(record_programs "")
 endif()

@@ -33,8 +33,8 @@ class Desk:
         self.environment = {name: value for name, value in os.environ.items()
                             if name not in ("DBUS_SESSION_BUS_ADDRESS", "AT_SPI_BUS_ADDRESS", "WAYLAND_DISPLAY")}
         self.environment.update(HOME=str(self.folder), XDG_RUNTIME_DIR=str(self.folder), LC_ALL="C.UTF-8")
-        self.start(["Xvfb", "-displayfd", str(write), "-screen", "0", size, "-nolisten", "tcp", "-noreset", *server],
-                   pass_fds=[write])
+        self.server = self.start(["Xvfb", "-displayfd", str(write), "-screen", "0", size, "-nolisten", "tcp",
+                                  "-noreset", *server], pass_fds=[write])
         os.close(write)
         with os.fdopen(read) as numbers:
             number = numbers.readline().strip()

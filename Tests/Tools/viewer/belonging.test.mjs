@@ -54,7 +54,7 @@ for (const [key, colour] of Object.entries(layers))
   test(`the layer of key ${key} is drawn when it is switched on`, () =>
     shown(async (page) => {
       const zoom = objectsWith(insights, 'start', 'end', 'factor', 'places')[0];
-      await seek(page, zoom.start + 1.2);
+      await seek(page, zoom.places.findLast(({ reason }) => reason === 'clicks').start + 0.7);
       assert.ok((await drawn(page, colour)) < 5);
       await page.keyboard.press(key);
       await appears(page, colour);

@@ -28,6 +28,7 @@ import { afterIdle } from './transport/skipping';
 import { setUpAutomation } from './ui/automation';
 import { setUpControls, type Controls } from './ui/controls';
 import { ask, setUpDialogs } from './ui/dialogs';
+import { breath } from './ui/breath';
 import { announce, byId, setText } from './ui/dom';
 import { setUpDrop } from './ui/drop';
 import { placeIcons } from './ui/icons';
@@ -45,7 +46,7 @@ export class App implements Page {
   readonly selection = new Selection();
   skipsIdle = false;
   private readonly insights = new InsightTables({
-    ask: (name, parameters) => this.decoder.insights(name, parameters),
+    ask: async (name, parameters) => (await this.decoder.insights({ name, parameters }))[0]!,
     onLoaded: () => this.requestFrame(),
     onProblem: (text) => this.complain(text),
   });
@@ -105,7 +106,7 @@ export class App implements Page {
       },
     });
     this.rangeBar = new RangeBar(this.selection, {
-      insights: (name, range) => this.insightsIn(name, range),
+      insights: (range) => this.insightsIn(range),
       movieName: () => this.fileName(),
       link: () => location.href.replace(/#.*/, '') + this.link(),
       onZoom: (range) => this.timeline.setRange(range),
@@ -196,9 +197,15 @@ export class App implements Page {
       mark('zulm:decoded');
       if (decoded.streams.length === 0 && decoded.hidden.length === 0) throw new Error(whyNothing(decoded));
       byId('notice').hidden = true;
-      this.decoded = complete(decoded);
-      this.adjustment = adjustmentIn(location.hash);
-      this.show(this.adjustedSession());
+      await breath(); // each step by itself, so that the page goes on
+      if (opening !== this.opened) return;
+      const completed = complete(decoded);
+      const adjustment = adjustmentIn(location.hash);
+      const session = sessionOf(completed, adjustment);
+      await breath();
+      if (opening !== this.opened) return;
+      [this.decoded, this.adjustment] = [completed, adjustment];
+      this.show(session);
       this.decoder.keep(id);
       if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
     } catch (error) {
@@ -241,8 +248,7 @@ export class App implements Page {
   }
 
   private adjustedSession(): Session {
-    const { decoded, adjustment } = this;
-    return new Session(shifted(decoded!, adjustment.offset), adjustment.region);
+    return sessionOf(this.decoded!, this.adjustment);
   }
 
   private showSession(session: Session): void {
@@ -260,6 +266,7 @@ export class App implements Page {
     this.player.setLength(session.duration, session.movieDuration === undefined);
     this.showSession(session);
     this.selection.setDuration(this.player.duration);
+    this.rangeBar.forget();
     this.selectionChanged();
     this.showDetails(session);
     this.writeLink();
@@ -439,9 +446,10 @@ export class App implements Page {
   }
 
   /// The range is one of the movie.
-  private insightsIn(name: 'activity' | 'applications', { from, to }: Range): ReturnType<Decoder['insights']> {
+  private insightsIn({ from, to }: Range): ReturnType<Decoder['insights']> {
     const { offset } = this.adjustment;
-    return this.decoder.insights(name, { start: from - offset, end: to - offset });
+    const parameters = { start: from - offset, end: to - offset };
+    return this.decoder.insights({ name: 'activity', parameters }, { name: 'applications', parameters });
   }
 
   switchLoop(): void {
@@ -565,6 +573,10 @@ export class App implements Page {
       this.complain(`The entries could not be saved: ${wordsOf(error)}.`);
     }
   }
+}
+
+function sessionOf(decoded: Decoded, { offset, region }: Adjustment): Session {
+  return new Session(shifted(decoded, offset), region);
 }
 
 /// A page writes names in addresses with percent signs.

@@ -18,13 +18,14 @@ export function showAdjusting({ offset, region }: Adjustment, events: AdjustEven
   const offsetField = field('Offset in seconds', decimal(offset));
   const numbers = region && [region.x, region.y, region.width, region.height];
   const regionFields = regionNames.map((name, i) => field(name, numbers ? decimal(numbers[i]!) : ''));
+  const labelled = regionFields.map((input, i) => make('label', {}, regionNames[i]!, input));
   const movie = make('input', { type: 'file', accept: '.mp4,.mov,.avi,.webm,.mkv,video/*', 'aria-label': 'Another movie' });
   const form = make(
     'form',
     { method: 'dialog', class: 'adjust' },
     make('p', {}, 'If the movie was cut or coded again, say here how the recording belongs to it. The file stays as it is.'),
     row('Offset', 'Seconds that are added to every time: −12.5 if the movie lacks the first 12.5 seconds.', offsetField),
-    row('Region', 'What the movie shows, in units of the display. Empty: as recorded.', ...regionFields),
+    row('Region', 'What the movie shows, in units of the display. Empty: as recorded.', ...labelled),
     row('Movie', 'Another movie to show the recording over.', movie),
     make(
       'div',

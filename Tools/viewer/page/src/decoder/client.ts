@@ -4,7 +4,7 @@ import type { Table } from '#decoder';
 import type { Decoded } from '../model/session';
 import type { PackedText } from './embedded';
 import { piecesOf } from './packed';
-import type { InsightName, Reply, Request } from './protocol';
+import type { Insight, Reply, Request } from './protocol';
 import { unwrapped } from './wire';
 import DecoderWorker from './worker?worker&inline';
 
@@ -47,10 +47,10 @@ export class Decoder {
   }
 
   /// What the library computes from what is kept.
-  async insights(name: InsightName, parameters: Record<string, number>): Promise<Table> {
-    const reply = await this.ask({ type: 'insights', opened: this.kept, name, parameters });
+  async insights(...asked: Insight[]): Promise<Table[]> {
+    const reply = await this.ask({ type: 'insights', opened: this.kept, asked });
     if (reply.type !== 'computed') throw new DecoderError('the decoder answered something else');
-    return reply.table;
+    return reply.tables;
   }
 
   private ask(wish: Wish): Promise<Reply> {

@@ -5,7 +5,7 @@ import type { FileCheck, FileInfo } from '../model/session';
 /// A file that was compressed, in base64.
 export interface PackedText {
   text: string;
-  /// Of the file.
+  /// The size of the file in bytes.
   size: number;
 }
 

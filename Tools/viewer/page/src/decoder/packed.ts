@@ -15,7 +15,7 @@ function bytesOf(base64: string): Uint8Array<ArrayBuffer> {
   return bytes;
 }
 
-/// Takes the place of the differences from `start` to `end` with the bytes themselves.
+/// Replaces the differences from `start` to `end` by the bytes themselves.
 function addUp(bytes: Uint8Array, start: number, end: number): void {
   for (let i = Math.max(start, distance); i < end; ++i) bytes[i]! += bytes[i - distance]!;
 }
@@ -23,7 +23,7 @@ function addUp(bytes: Uint8Array, start: number, end: number): void {
 export class PackedFile {
   private readonly pieces: Uint8Array<ArrayBuffer>[] = [];
 
-  /// Of base64.
+  /// Takes the next piece of the text.
   take(text: string): void {
     this.pieces.push(bytesOf(text));
   }

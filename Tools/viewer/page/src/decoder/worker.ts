@@ -65,8 +65,17 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
   return { decoded, problems };
 }
 
+/// What was asked something after it was opened. It stays open, since more questions follow.
+let asked: { id: number; recording: Recording } | undefined;
+
+function closeAsked(): void {
+  asked?.recording.close();
+  asked = undefined;
+}
+
 function keep(id: number): void {
   for (const other of recordings.keys()) if (other !== id) recordings.delete(other);
+  if (asked?.id !== id) closeAsked();
 }
 
 function reopening(source: Blob | number, name: string): Reopen {
@@ -76,20 +85,32 @@ function reopening(source: Blob | number, name: string): Reopen {
   return async () => Recording.open(await file.unpacked(source), name);
 }
 
-/// Uses what was opened under this number, and closes it after that.
-async function using<Result>(id: number, use: (recording: Recording) => Result): Promise<Result> {
+function opened(id: number): Promise<Recording> {
   const reopen = recordings.get(id);
   if (!reopen) throw new ZulmError('the recording has to be opened again');
-  const recording = await reopen();
+  return reopen();
+}
+
+/// Asks what was opened under this number. What has failed is opened anew for the next question.
+async function using<Result>(id: number, use: (recording: Recording) => Result): Promise<Result> {
+  if (asked?.id !== id) {
+    const recording = await opened(id);
+    closeAsked();
+    asked = { id, recording };
+  }
   try {
-    return use(recording);
-  } finally {
-    recording.close();
+    return use(asked.recording);
+  } catch (error) {
+    closeAsked();
+    throw error;
   }
 }
 
+/// Closes it before the rest is worked out, which takes memory too.
 async function open(id: number, name: string, reports: boolean): Promise<{ decoded: Decoded; problems: string[] }> {
-  const { decoded, problems } = await using(id, (recording) => decode(recording, name, reports));
+  const recording = await opened(id);
+  const { decoded, problems } = decode(recording, name, reports);
+  recording.close();
   decoded.prepared = prepare(decoded.entries.map((entries) => new Track(entries)));
   return { decoded: wrapped(decoded), problems };
 }
@@ -103,13 +124,14 @@ async function answer(request: Exclude<Request, { type: 'piece' }>): Promise<[Re
   if (request.type === 'dump')
     return [{ id, type: 'dumped', text: await using(request.opened, (recording) => recording.dump()) }, []];
   if (request.type === 'insights') {
-    const { opened, name, parameters } = request;
-    return [{ id, type: 'computed', table: await using(opened, (recording) => recording.insights(name, parameters)) }, []];
+    const { opened, asked } = request;
+    const compute = (recording: Recording) => asked.map(({ name, parameters }) => recording.insights(name, parameters));
+    return [{ id, type: 'computed', tables: await using(opened, compute) }, []];
   }
   const { source, name, reports } = request;
   recordings.set(id, reopening(source, name));
-  const opened = await open(id, name, reports);
-  return [{ id, type: 'opened', ...opened }, [...buffersIn(opened.decoded)]];
+  const result = await open(id, name, reports);
+  return [{ id, type: 'opened', ...result }, [...buffersIn(result.decoded)]];
 }
 
 self.onmessage = async ({ data }: MessageEvent<Request>) => {

@@ -3,7 +3,7 @@
 const digit = 16; // bits at a time
 const buckets = 1 << digit;
 
-/// Takes the place of numbers with whole ones of 64 bits, as two halves each, that have the same order.
+/// Replaces each number by a whole number of 64 bits, in two halves, such that the order stays.
 function sortable(keys: Float64Array, isDescending: boolean): Uint32Array {
   const halves = new Uint32Array(keys.buffer, keys.byteOffset, 2 * keys.length);
   for (let i = 0; i < keys.length; ++i) {
@@ -31,7 +31,7 @@ export function orderOf(keys: Float64Array, isDescending: boolean): Uint32Array<
   return rows;
 }
 
-/// By one digit; false if all have the same.
+/// Orders rows by one digit. Returns false if all rows have the same digit, and does nothing then.
 function distribute(halves: Uint32Array, from: Uint32Array, to: Uint32Array, half: number, shift: number): boolean {
   const starts = new Uint32Array(buckets + 1);
   const digitOf = (row: number) => (halves[2 * row + half]! >>> shift) & (buckets - 1);

@@ -4,7 +4,7 @@ import { orderOf, picked, placesOf } from './sorting';
 
 export type SortRequest =
   | { id: number; keys: Float64Array; isDescending: boolean }
-  /// Of those that were sorted last.
+  /// Asks for these rows in the order that was sorted last; null asks for all.
   | { id: number; matches: Uint32Array | null };
 
 export interface Sorted {

@@ -84,7 +84,7 @@ export function cachedTest(column: ArrayLike<unknown>, textOf: (value: unknown) 
   };
 }
 
-/// For the times of entries as a clock shows them.
+/// Looks at the times of entries as a clock shows them.
 export function clockTest(times: Float64Array, textOf: (time: number) => string, word: string): RowTest {
   const isOrdinary = (time: number) => time >= 0 && time < Infinity;
   const search = /^[\d:.]+$/.test(word) ? new DigitSearch(word) : undefined;
@@ -95,7 +95,7 @@ export function clockTest(times: Float64Array, textOf: (time: number) => string,
   };
 }
 
-/// For a column of numbers. `textOf` is how another one than a whole number is shown.
+/// Looks at a column of numbers. `textOf` says how a number that is not whole is shown.
 export function numberTest(column: ArrayLike<number>, textOf: (value: number) => string, word: string): RowTest {
   const isWhole = column instanceof Int32Array || column instanceof Uint32Array;
   if (isWhole) {

@@ -35,7 +35,8 @@ export function drawZoom(context: Context, scene: Scene): void {
     context.lineWidth = width * scene.unit;
     context.strokeRect(rect.x, rect.y, rect.width, rect.height);
   }
-  tag(context, { ...scene, accent: '#8a5a00' }, rect, `Zoom ${zoom.toFixed(2)}×`);
+  const edge = { ...rect, y: rect.y + rect.height }; // the upper one is the window's
+  tag(context, { ...scene, accent: '#8a5a00' }, edge, `Zoom ${zoom.toFixed(2)}×`);
 }
 
 /// The clicks for which one place of a zoom was made, in their order.

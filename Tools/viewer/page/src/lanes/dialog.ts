@@ -1,4 +1,4 @@
-// The dialog in which the lanes are arranged: with the keyboard, and where there is no room to drag.
+// The dialog in which the lanes are arranged: with the keyboard, or if there is no room to drag.
 
 import { fillDialog } from '../ui/dialogs';
 import { announce, byId, make } from '../ui/dom';
@@ -9,7 +9,7 @@ import type { Lane } from './lane';
 export interface LanesPage {
   readonly lanes: Lane[];
   readonly arrangement: Arrangement;
-  /// After the arrangement was changed.
+  /// Called after the arrangement was changed.
   rearrange(): void;
   resetLanes(): void;
 }

@@ -16,7 +16,7 @@ export interface LaneOptions {
   showsKeys: () => boolean;
   /// What of the screen the movie shows.
   region: () => Rect;
-  /// By time.
+  /// The notes in the order of their times.
   notes: () => readonly Note[];
 }
 

@@ -133,7 +133,7 @@ export class Timeline {
     this.setRange({ from: 0, to: duration });
   }
 
-  /// Puts the lanes where the reader wants them.
+  /// Orders the lanes as the reader wants them.
   private placeLanes(): void {
     const { pinned, others } = this.arrangement.arranged(this.lanes);
     const events: LabelEvents = {
@@ -150,7 +150,7 @@ export class Timeline {
     this.invalidate();
   }
 
-  /// After the notes changed.
+  /// Called after the notes changed.
   refreshLanes(): void {
     if (!this.session) return;
     this.lanes = lanesOf(this.session, this.events);
@@ -167,7 +167,7 @@ export class Timeline {
     this.rearrange();
   }
 
-  /// After the arrangement was changed.
+  /// Called after the arrangement was changed.
   rearrange(): void {
     store(arrangementKey, this.arrangement.text());
     this.placeLanes();

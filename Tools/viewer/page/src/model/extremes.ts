@@ -2,7 +2,7 @@
 
 const block = 64; // values that are looked at one by one
 
-/// Of blocks of values, as trees: the leaves are the second half.
+/// The extremes of blocks of values, as trees: the leaves are the second half.
 export interface Bounds {
   least: Float32Array;
   greatest: Float32Array;
@@ -43,7 +43,7 @@ export class Extremes {
     private readonly bounds: Bounds = boundsOf(values),
   ) {}
 
-  /// Of the values from `first` up to, without, `end`; infinite where there are none.
+  /// Returns those of the values from `first` to before `end`, or infinities if there are no values.
   of(first: number, end: number): [number, number] {
     [this.least, this.greatest] = [Infinity, -Infinity];
     const start = Math.ceil(first / block);

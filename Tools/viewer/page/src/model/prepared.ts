@@ -8,7 +8,7 @@ import type { Track } from './track';
 export interface Prepared {
   speed: Speed;
   speedBounds: Bounds;
-  /// Of the positions of the cursor, if they are in the order of their times.
+  /// These belong to the positions of the cursor.
   xBounds: Bounds | undefined;
   yBounds: Bounds | undefined;
   merged: Merged;

@@ -11,7 +11,7 @@ export interface NotesEvents {
   time: () => number;
   onSeek: (time: number) => void;
   onProblem: (text: string) => void;
-  /// After a note came, went or changed.
+  /// Called after a note came, went or changed.
   onChange: () => void;
 }
 
@@ -25,7 +25,7 @@ export class NotesPane {
   private session: Session | undefined;
   private notes: Note[] = [];
   private readonly list = make('ol', { class: 'notes' });
-  private readonly status = make('output', { class: 'entries-status', 'aria-live': 'polite' });
+  private readonly status = make('output', { class: 'notes-status', 'aria-live': 'polite' });
   private readonly field = make('input', {
     class: 'field',
     'aria-label': 'Note at the playhead',

@@ -13,8 +13,8 @@ import type { Range } from '../lanes/axis';
 import type { Selection } from './selection';
 
 export interface RangeEvents {
-  /// Asks the library about a range of the movie's time.
-  insights: (name: 'activity' | 'applications', range: Range) => Promise<Table>;
+  /// Asks the library about the activity and the applications in a range of the movie's time.
+  insights: (range: Range) => Promise<Table[]>;
   movieName: () => string;
   link: () => string;
   onZoom: (range: Range) => void;
@@ -32,8 +32,10 @@ export class RangeBar {
   private readonly heat: HTMLButtonElement;
   private timer: ReturnType<typeof setTimeout> | undefined;
   private asked = 0;
+  private isAsking = false;
   /// Lines of a name and a value.
   private lines: [string, string][] = [];
+  private told: Range | undefined;
   readonly element = make('section', { class: 'range-bar', 'aria-label': 'Selection', hidden: true });
 
   constructor(
@@ -81,6 +83,8 @@ export class RangeBar {
     this.makeRoom();
     this.loop.setAttribute('aria-pressed', String(loops));
     this.heat.setAttribute('aria-pressed', String(hasHeat));
+    if (range === this.told) return;
+    this.told = range;
     const asked = ++this.asked;
     clearTimeout(this.timer);
     if (!range) return;
@@ -95,17 +99,24 @@ export class RangeBar {
     this.timer = setTimeout(() => void this.ask(range, asked), patience);
   }
 
+  /// What was told before is not true any more.
+  forget(): void {
+    this.told = undefined;
+  }
+
+  /// One question at a time: while the library works, only the last selection counts.
   private async ask(range: Range, asked: number): Promise<void> {
+    if (this.isAsking) return;
+    this.isAsking = true;
     try {
-      const tables = await Promise.all([
-        this.events.insights('activity', range),
-        this.events.insights('applications', range),
-      ]);
+      const tables = await this.events.insights(range);
       if (asked === this.asked) this.tell(...(tables.map((table) => new Track(table)) as [Track, Track]));
     } catch (error) {
       if (asked === this.asked) this.events.onProblem(`The selection cannot be looked at: ${error instanceof Error ? error.message : error}.`);
     } finally {
+      this.isAsking = false;
       if (asked === this.asked) this.element.classList.remove('is-asking');
+      else if (this.told) void this.ask(this.told, this.asked);
     }
   }
 

@@ -4,6 +4,8 @@ import { make } from '../ui/dom';
 import { dragging } from '../lanes/gestures';
 import type { Range } from '../lanes/axis';
 
+const room = 20; // pixels that an edge takes beside the range
+
 export interface RangePlace {
   xOf: (time: number) => number;
   timeAt: (x: number) => number;
@@ -54,5 +56,7 @@ export class SelectionView {
     const [left, right] = [within(place.xOf(this.range.from)), within(place.xOf(this.range.to))];
     this.element.style.transform = `translateX(${left}px)`;
     this.element.style.width = `${right - left}px`;
+    this.edges.from.classList.toggle('is-inside', left < room);
+    this.edges.to.classList.toggle('is-inside', right > place.width - room);
   }
 }

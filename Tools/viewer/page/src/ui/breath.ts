@@ -3,7 +3,7 @@
 const channel = new MessageChannel();
 const waiting: (() => void)[] = [];
 channel.port1.onmessage = () => waiting.shift()?.();
-// In Node an open port would keep the program.
+// An open port would keep a program in Node from ending.
 (channel.port1 as { unref?: () => void }).unref?.();
 
 export function breath(): Promise<void> {
