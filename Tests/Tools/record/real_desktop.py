@@ -1,6 +1,6 @@
 """Records somebody who works with an editor and a terminal, on an X server without a screen, and checks that everything
 that she did is in the streams. Usage: real_desktop.py [MOVIE]. The movie must not exist; without a name it is removed.
-Ends with 77 if programs are missing or no X server can be started. The variables ZULM_RECORD and ZULM name the programs.
+Ends with 77 if programs are missing or no X server can be started. The variable ZULM_RECORD names the recorder.
 """
 
 import os
@@ -26,7 +26,7 @@ trap 'printf "\e]2;%s\a" "$BASH_COMMAND"' DEBUG
 IS_VIRTUAL, CONTROL = 0x40000000, 0x40000
 LEFT_DOWN, LEFT_UP, NO_BUTTON_YET = 1, 2, 256
 NOTCH = 120
-LATE = 0.2  # seconds: the server tells positions after motions, and not of warps. She rests for longer before and after she uses a button
+LATE = 0.2  # seconds, since the server does not tell of warps. She rests for longer before and after each press
 END_KEY = (35, IS_VIRTUAL)
 
 
@@ -169,7 +169,7 @@ def start(desk, movie):
 
 
 def wait_until_keys_are_recorded(desk, recording):
-    """Presses End until it is in the stream. What is typed before the bus has told where the focus is, is left out."""
+    """Presses End until it is in the stream. What is typed while the focus is unknown is left out."""
     def count():
         return sum(entry.value == END_KEY for entry in kept(recording).get("keyboardAction", []))
     before = count()
@@ -316,8 +316,8 @@ def failures_of(movie, person):
 
 def missing_programs():
     missing = [] if PROGRAMS["recorder"] else ["zulm-record, whose libraries 'scripts/install.sh record' installs"]
-    programs = ("Xvfb", "openbox", "xdotool", "xprop", "xwininfo", "xset", "xsetroot", "xterm", "l3afpad", "dbus-daemon",
-                "ffprobe")
+    programs = ("Xvfb", "openbox", "xdotool", "xprop", "xwininfo", "xset", "xsetroot", "xterm", "l3afpad",
+                "dbus-daemon", "ffprobe")
     return missing + [name for name in programs if not shutil.which(name)]
 
 
