@@ -452,6 +452,10 @@ export class App implements Page {
     return this.decoder.insights({ name: 'activity', parameters }, { name: 'applications', parameters });
   }
 
+  selectSome(): void {
+    this.timeline.selectSome();
+  }
+
   switchLoop(): void {
     this.rangeBar.switchLoop();
   }

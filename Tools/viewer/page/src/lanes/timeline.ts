@@ -109,7 +109,6 @@ export class Timeline {
       tool('plus', 'Zoom in', () => this.zoom(0.5)),
       tool('fit', 'Show all', () => this.showAll()),
       tool('lanes', 'Arrange the lanes', () => arrangeLanes(this)),
-      tool('range', 'Select a range', () => this.selectSome()),
       this.zoomText,
     );
     this.ruler.append(this.rulerCanvas);
@@ -219,7 +218,7 @@ export class Timeline {
   }
 
   /// A part of what is in sight, whose edges can be dragged then.
-  private selectSome(): void {
+  selectSome(): void {
     const { from, to } = this.range;
     const part = (to - from) / 4;
     const start = Math.max(from, Math.min(this.time, to - part));

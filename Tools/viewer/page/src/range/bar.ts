@@ -62,7 +62,7 @@ export class RangeBar {
         tool('search', 'Filter the entries', 'Show its entries', (range) => events.onFilter(range)),
         tool('copy', 'Copy', 'Copy what is said here', () => this.copy(this.text(), 'The selection is copied')),
         tool('link', 'Copy a link', 'Copy a link to it', () => this.copy(events.link(), 'The link is copied')),
-        tool('save', 'Save as an edit list', 'Save an edit list for zulm cut and zulm retime', (range) => this.saveEdits(range), 'Edits'),
+        tool('save', 'Edits: save as an edit list', 'Save an edit list for zulm cut and zulm retime', (range) => this.saveEdits(range), 'Edits'),
         tool('save', 'Save as a list for ffmpeg', 'Save a list for the concat demuxer of ffmpeg', (range) => this.saveConcat(range), 'ffmpeg'),
         tool('close', 'Select nothing', 'Select nothing  Esc', () => selection.clear()),
       ),

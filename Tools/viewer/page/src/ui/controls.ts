@@ -33,6 +33,7 @@ export function setUpControls(page: Page): Controls {
   on('movie-out', () => page.zoomMovie(1 / 1.5));
   on('movie-fit', () => page.zoomMovie(0));
   on('save-still', () => page.saveStill());
+  on('select-some', () => page.selectSome());
   setUpMenu('more-button', 'more-menu');
   setUpClock(page);
   setUpStage(page);

@@ -35,4 +35,6 @@ export interface Page {
   switchLoop(): void;
   switchSkipping(): void;
   saveStill(): void;
+  /// Selects a part of what the lanes show.
+  selectSome(): void;
 }
