@@ -31,7 +31,7 @@ int createdFile(std::string& name) {
 LockFile::LockFile(const FileLocation& file, std::string_view note) : LockFile(file, note, file.native() + ".XXXXXX") {}
 
 /// Nothing may fail between the creation of the file and `try`: the temporary name would stay.
-LockFile::LockFile(const FileLocation& file, std::string_view note, std::string temporary)
+LockFile::LockFile(const FileLocation& file, std::string_view note, std::string&& temporary)
     : file_(file), descriptor_(createdFile(temporary)) {
     try {
         if (isLockable(descriptor_.number(), LOCK_EX)) // an empty file counts as held

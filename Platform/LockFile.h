@@ -35,7 +35,7 @@ public:
 
 private:
     /// Creates the file under a temporary name, whose last six characters the system replaces.
-    LockFile(const FileLocation& file, std::string_view note, std::string temporary);
+    LockFile(const FileLocation& file, std::string_view note, std::string&& temporary);
 
     FileLocation file_;
     Descriptor descriptor_;
