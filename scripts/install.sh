@@ -15,6 +15,7 @@ record=(libx11-dev libxtst-dev libxcb1-dev libxcb-shm0-dev libxcb-xfixes0-dev li
 desktop=(xvfb openbox xdotool xterm x11-utils x11-xserver-utils x11-xkb-utils xkb-data at-spi2-core dbus ffmpeg python3)
 python=(python3-dev python3-numpy python3-pybind11 pybind11-dev python3-pip python3-setuptools python3-wheel python3-pytest
     python3-matplotlib mypy)
+many=(python3-pandas python3-dask python3-distributed) # for many recordings at once
 docs=(doxygen mkdocs python3-pygments)
 check=(clang clang-format git)
 lint=(clang clang-format clang-tidy cppcheck shellcheck codespell git python3)
