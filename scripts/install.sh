@@ -17,6 +17,7 @@ passwords=(python3-gi gir1.2-gtk-3.0)
 sound=(pulseaudio pulseaudio-utils)
 python=(python3-dev python3-numpy python3-pybind11 pybind11-dev python3-pip python3-setuptools python3-wheel python3-pytest
     python3-matplotlib mypy)
+many=(python3-pandas python3-dask python3-distributed) # for many recordings at once
 docs=(doxygen mkdocs python3-pygments)
 check=(clang clang-format git)
 lint=(clang clang-format clang-tidy cppcheck shellcheck codespell git python3)

@@ -48,20 +48,25 @@ from ._entries import Entries as _Entries
 from ._entries import Records as _Records
 from ._entries import records_of as _records_of
 from ._kinds import Kind
+from ._scan import Batch, Failure, OnError, Scan
 from ._tables import table_of as _table_of
 
 __all__ = [
     "Attached",
     "AttachedStream",
+    "Batch",
     "Creator",
+    "Failure",
     "Finding",
     "Kind",
+    "OnError",
     "RecordedStream",
     "Recording",
     "Repair",
     "RepairChange",
     "Report",
     "SaveError",
+    "Scan",
     "StreamReport",
     "StreamWriter",
     "__version__",
@@ -72,6 +77,7 @@ __all__ = [
     "modifiers_text",
     "recorded_kinds",
     "repair",
+    "scan",
     "stamp",
     "to_pandas",
     "verify",
@@ -225,6 +231,26 @@ def to_pandas(records: _Records) -> Any:
     pandas = importlib.import_module("pandas")
     frame = pandas.DataFrame({name: records[name] for name in records.dtype.names or ()})
     return frame.set_index("time") if "time" in frame else frame
+
+
+def scan(
+    recordings: _Path | Iterable[_Path],
+    kind: Kind,
+    *,
+    columns: Iterable[str] | None = None,
+    on_error: OnError = "raise",
+) -> Scan:
+    """Returns the entries of one kind in many recordings: in batches, as a pandas frame or as a Dask frame.
+
+        for batch in zulmetadata.scan("Recordings/**/*.mp4", "cursorLocation", columns=["x"], on_error="skip"):
+            print(batch.recording, batch.time[-1], batch.fields["x"].max())
+
+    `recordings` is a path, a pattern as `glob` has them (with "**" for folders inside folders, in the order of the
+    names), or an iterable of paths. `columns` are some of the fields of the kind; all of them if it is None. If a
+    recording cannot be read, its error is raised, or, if `on_error` is "skip" or "report", the others are read all the
+    same; "report" says afterwards what failed and why. A recording without entries of the kind is no failure.
+    """
+    return Scan(recordings, kind, None if columns is None else list(columns), on_error)
 
 
 _SOURCE_TYPES = (str, os.PathLike, RecordedStream, Recording)
