@@ -122,8 +122,8 @@ EditList readCutTable(std::string_view text, const std::string& file, const Edit
         list.moveTo("row", row);
         if (!takeRow(text, separator, fields))
             list.fail("a quotation mark has no second one");
-        if (std::all_of(fields.begin(), fields.end(), [](const auto& field) { return trimmed(field).empty(); }))
-            continue; // spreadsheets append such rows
+        if (fields.size() == 1 && trimmed(fields[0]).empty())
+            continue;
         if (fields.size() < 2)
             list.fail("it has no columns for the start, the end and the label");
         const auto start = timeIn(list, fields[0]);
