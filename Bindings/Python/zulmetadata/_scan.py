@@ -164,8 +164,6 @@ class Scan:
         columns: Sequence[str] | None,
         on_error: OnError,
     ) -> None:
-        if isinstance(columns, str):
-            raise TypeError(f"columns is a list of names, such as [{columns!r}]")
         names = (_core.dtype_of(kind).names or ())[1:]
         fields = names if columns is None else tuple(columns)
         unknown = [name for name in fields if name not in names]
