@@ -27,12 +27,13 @@ LEFT_OUT = [
     "TextReader.AsksForLittleMoreMemoryThanThereIsInputUntilItEnds",
     "TextReader.WrapsASizeBelowThatOfTheTimeAround",
 ]
-# Tests of large pictures of one colour, of millions of entries, and of every number or character. They take minutes and
+# Tests of large pictures of one colour, of millions of entries or random edits, and of every number or character. They take minutes and
 # cover few lines, so only the long form runs them.
 SLOW = [
     "*Million*",
     "EditList.RefusesDeepAndLargeDocuments",
     "EditList.RefusesDenominatorsWithoutEnd",
+    "Retiming.DoesWhatTheOracleDoesForRandomEdits",
     "EncodedImageCheck.DoesNotUnpackAGigabyteOfPixels",
     "EncodedImageCheck.DoesNotUnpackALargeTIFFFile",
     "EncodedImageCheck.SeesWrongCheckSumsInAPictureThatIsTooLargeToUnpack",
