@@ -60,6 +60,16 @@ for (const [key, colour] of Object.entries(layers))
       await disappears(page, colour);
     }));
 
+test('a link switches on what the library computes', async () => {
+  const zoom = objectsWith(insights, 'start', 'end', 'factor', 'places')[0];
+  const { page, problems, close } = await open(recording.page, { hash: `#t=${zoom.start + 2}&layers=cursor,zooms` });
+  await opened(page);
+  await ready(page);
+  await appears(page, layers[8]);
+  assert.deepEqual(problems, []);
+  await close();
+});
+
 test('the suggested zoom shows what the camera of the library shows', () =>
   shown(async (page) => {
     const zoom = objectsWith(insights, 'start', 'end', 'factor', 'places')[0];

@@ -13,6 +13,7 @@ import { Timeline } from './lanes/timeline';
 import { assumption } from './model/checks';
 import { clock, shown } from './model/format';
 import { decimal } from './model/decimals';
+import { shortestIdle } from './model/idle';
 import { joined, type Joined } from './model/joining';
 import { markerAfter, markerBefore } from './model/markers';
 import { Session, type Decoded } from './model/session';
@@ -158,12 +159,8 @@ export class App implements Page {
     if (!embedded) return;
     const { metadata, name, movie, info, verify } = embedded;
     this.setMovie(movie, movie ?? '');
-    void this.open(metadata, name, (decoded) => ({
-      ...decoded,
-      info,
-      verify,
-      duration: info.duration ?? decoded.duration,
-    }));
+    const complete = (decoded: Decoded) => ({ ...decoded, info, verify, duration: info.duration ?? decoded.duration });
+    void this.open(metadata, name, { complete });
   }
 
   /// One recording: a movie, or stream files, or both.
@@ -177,16 +174,13 @@ export class App implements Page {
     }
     const { contents, name, movie } = recording;
     const url = movie ? URL.createObjectURL(movie) : null;
-    await this.open(contents, name, (decoded) => {
-      this.setMovie(url, movie?.name ?? '');
-      history.replaceState(null, '', linkTo(0)); // the address told a time of the recording before
-      return decoded;
-    });
+    // The address tells a time of the recording that is shown.
+    await this.open(contents, name, { movie: { url, name: movie?.name ?? '' }, address: linkTo(0) });
     if (url !== null && this.movieUrl !== url) URL.revokeObjectURL(url);
   }
 
   /// What is open stays where the new one cannot be read.
-  private async open(source: Blob | PackedText, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
+  private async open(source: Blob | PackedText, name: string, { complete, movie, address }: Coming): Promise<void> {
     const opening = ++this.opened;
     document.body.classList.add('is-busy');
     setText(byId('welcome-title'), `Opening ${shown(name)}…`);
@@ -199,14 +193,17 @@ export class App implements Page {
       byId('notice').hidden = true;
       await breath(); // each step by itself, so that the page goes on
       if (opening !== this.opened) return;
-      const completed = complete(decoded);
-      const adjustment = adjustmentIn(location.hash);
+      const completed = complete?.(decoded) ?? decoded;
+      const adjustment = adjustmentIn(address ?? location.hash);
       const session = sessionOf(completed, adjustment);
       await breath();
       if (opening !== this.opened) return;
+      // Nothing below waits: what was shown before stays whole until all of the new one is there.
+      if (movie) this.setMovie(movie.url, movie.name);
+      if (address !== undefined) history.replaceState(null, '', address);
       [this.decoded, this.adjustment] = [completed, adjustment];
+      this.decoder.keep(id); // what is drawn first may ask it
       this.show(session);
-      this.decoder.keep(id);
       if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
     } catch (error) {
       if (opening !== this.opened) return;
@@ -449,7 +446,8 @@ export class App implements Page {
   private insightsIn({ from, to }: Range): ReturnType<Decoder['insights']> {
     const { offset } = this.adjustment;
     const parameters = { start: from - offset, end: to - offset };
-    return this.decoder.insights({ name: 'activity', parameters }, { name: 'applications', parameters });
+    const activity = { ...parameters, least: shortestIdle };
+    return this.decoder.insights({ name: 'activity', parameters: activity }, { name: 'applications', parameters });
   }
 
   selectSome(): void {
@@ -577,6 +575,16 @@ export class App implements Page {
       this.complain(`The entries could not be saved: ${wordsOf(error)}.`);
     }
   }
+}
+
+/// What a recording brings with it.
+interface Coming {
+  /// Adds what the page knows.
+  complete?: (decoded: Decoded) => Decoded;
+  /// Without it, the movie that was set is its own.
+  movie?: { url: string | null; name: string };
+  /// Without it, the address of the page tells how it is shown.
+  address?: string;
 }
 
 function sessionOf(decoded: Decoded, { offset, region }: Adjustment): Session {

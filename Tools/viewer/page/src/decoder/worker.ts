@@ -66,10 +66,10 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
 }
 
 /// What was asked something after it was opened. It stays open, since more questions follow.
-let asked: { id: number; recording: Recording } | undefined;
+let asked: { id: number; recording: Promise<Recording> } | undefined;
 
 function closeAsked(): void {
-  asked?.recording.close();
+  asked?.recording.then((recording) => recording.close()).catch(() => {}); // who asked is told
   asked = undefined;
 }
 
@@ -91,17 +91,18 @@ function opened(id: number): Promise<Recording> {
   return reopen();
 }
 
-/// Asks what was opened under this number. What has failed is opened anew for the next question.
+/// Asks what was opened under this number: all questions ask the same one. What has failed is opened anew for the next.
 async function using<Result>(id: number, use: (recording: Recording) => Result): Promise<Result> {
   if (asked?.id !== id) {
-    const recording = await opened(id);
+    const recording = opened(id);
     closeAsked();
     asked = { id, recording };
   }
+  const mine = asked;
   try {
-    return use(asked.recording);
+    return use(await mine.recording);
   } catch (error) {
-    closeAsked();
+    if (asked === mine) closeAsked();
     throw error;
   }
 }
