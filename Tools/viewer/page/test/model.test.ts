@@ -138,6 +138,8 @@ test('idle times are what the library tells', () => {
   ]);
   assert.equal(idleTime(stretches), 15.5);
   assert.deepEqual(idleIn(undefined, 20), []);
+  const early = { kind: 'idle', time: Float64Array.of(-10), columns: { end: Float64Array.of(4) } };
+  assert.deepEqual(idleIn(early, 20), [{ start: 0, end: 4 }], 'an offset moved it before the movie');
 });
 
 test('the last region with an area is the recorded one, and the movie says how long it is', () => {

@@ -40,6 +40,20 @@ test('in and out points move one edge, or make a range with an end of the record
   assert.equal(selection.range, undefined);
 });
 
+test('a selection ends where the movie ends, also after the movie became shorter', () => {
+  const selection = new Selection();
+  let told = 0;
+  selection.onChange = () => ++told;
+  selection.start(20);
+  selection.select(5, 20);
+  selection.setDuration(18);
+  assert.deepEqual([selection.range, told], [{ from: 5, to: 18 }, 2]);
+  selection.setDuration(18);
+  assert.equal(told, 2);
+  selection.setDuration(4);
+  assert.equal(selection.range, undefined);
+});
+
 test('extending keeps the edge where the selection began', () => {
   const selection = new Selection();
   selection.start(10);
@@ -62,7 +76,7 @@ test('an adjustment is read from a link as it was written', () => {
   const adjustment = { offset: -12.5, region: { x: -1920, y: 0, width: 1280, height: 720 } };
   assert.equal(withParts('#t=1', partsOfAdjustment(adjustment)), '#t=1&offset=-12.5&region=-1920,0,1280,720');
   assert.deepEqual(adjustmentIn('#t=1&offset=-12.5&region=-1920,0,1280,720'), adjustment);
-  for (const hash of ['', '#offset=x', '#region=1,2,3', '#region=0,0,0,5']) assert.deepEqual(adjustmentIn(hash), asRecorded);
+  for (const hash of ['', '#offset=x', `#offset=${'9'.repeat(400)}`, `#region=0,0,${'9'.repeat(400)},5`, '#region=1,2,3', '#region=0,0,0,5']) assert.deepEqual(adjustmentIn(hash), asRecorded);
 });
 
 test('an offset moves all times of a table and nothing else', () => {

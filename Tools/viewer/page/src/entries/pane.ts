@@ -218,7 +218,7 @@ export class EntriesPane {
     this.table.showOrder(wanted);
     this.showStatus();
     if (!wanted) return this.table.choose(this.matches);
-    await this.sorter.sort(rows, wanted);
+    await this.sorter.sort(rows, wanted, () => wanted !== this.order);
     if (wanted !== this.order) return;
     this.isSorting = false;
     if (this.isDone) await this.showSorted();

@@ -52,8 +52,10 @@ export class Sorter {
   private lastId = 0;
   private readonly waiting = new Map<number, (sorted: Sorted) => void>();
 
-  async sort(rows: Rows, { column, isDescending }: SortOrder): Promise<void> {
+  /// Changes nothing if another order was asked for meanwhile.
+  async sort(rows: Rows, { column, isDescending }: SortOrder, isObsolete: () => boolean): Promise<void> {
     const keys = await keysOf(rows, column);
+    if (isObsolete()) return;
     this.send({ id: 0, keys, isDescending }, [keys.buffer as ArrayBuffer]);
   }
 

@@ -2,7 +2,7 @@
 
 import type { Table } from '#decoder';
 import { copyText } from '../entries/copy';
-import { clock, count, plural } from '../model/format';
+import { clock, count, plural, shown } from '../model/format';
 import { decimal } from '../model/decimals';
 import { Track } from '../model/track';
 import { announce, byId, make, setText } from '../ui/dom';
@@ -123,7 +123,7 @@ export class RangeBar {
   private tell(activity: Track, applications: Track): void {
     const number = (name: string) => activity.number(name, 0);
     const names = Array.from({ length: applications.count }, (_, i) => ({
-      name: applications.entries.columns.name![i] || 'No name',
+      name: shown(String(applications.entries.columns.name![i] || 'No name')),
       time: `${clock(Number(applications.entries.columns.duration![i]), 1)}`,
     }));
     const known: [string, string][] = [

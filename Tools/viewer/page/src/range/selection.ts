@@ -23,8 +23,11 @@ export class Selection {
     [this.duration, this.selected, this.loops, this.hasHeat] = [duration, undefined, false, false];
   }
 
+  /// What lies beyond the new end is selected no longer.
   setDuration(duration: number): void {
     this.duration = duration;
+    const { selected } = this;
+    if (selected && selected.to > duration) this.select(selected.from, selected.to);
   }
 
   /// Between two times in any order.
