@@ -51,3 +51,12 @@ test('a file without notes is refused, and no note comes twice', () => {
     assert.throws(() => notesIn(text), text);
   assert.deepEqual(joined(notes.slice(1), notes), notes);
 });
+
+test('a file of notes has bounds, and its times are numbers', () => {
+  const file = (notes: unknown[]) => JSON.stringify({ schema: 'zulm.notes', schema_version: 1, notes });
+  const many = Array.from({ length: 10_001 }, (_, i) => ({ time: i, text: 'note' }));
+  assert.throws(() => notesIn(file(many)), /10001 notes.*10000 at most/);
+  for (const time of ['', [], true, null]) assert.throws(() => notesIn(file([{ time, text: 'note' }])), /holds no notes/);
+  const note = { time: 1, text: 'twice' };
+  assert.deepEqual(joined([], [note, { ...note }]), [note]);
+});

@@ -25,19 +25,22 @@ function quoted(text: string): string {
   return /[",\r\n]/.test(text) ? `"${text.replaceAll('"', '""')}"` : text;
 }
 
-/// Takes a file that `notesText` made. Throws if it holds no notes.
+const mostNotes = 10_000;
+
+/// Takes a file that `notesText` made. Throws if it holds no notes, or more than a page can show.
 export function notesIn(text: string): Note[] {
   const source = text.replace(/^\ufeff/, '').replaceAll('\r\n', '\n');
   const notes = source.trimStart().startsWith('{') ? fromJSON(source) : source.startsWith('time,text') ? fromCSV(source) : fromMarkdown(source);
   const good = notes.filter((note) => Number.isFinite(note.time) && note.time >= 0 && note.text.trim() !== '');
   if (good.length === 0) throw new Error('it holds no notes');
+  if (good.length > mostNotes) throw new Error(`it holds ${good.length} notes, and the page shows ${mostNotes} at most`);
   return sortedNotes(good);
 }
 
 function fromJSON(text: string): Note[] {
   const { schema, notes } = JSON.parse(text) as { schema?: unknown; notes?: unknown };
   if (schema !== 'zulm.notes' || !Array.isArray(notes)) throw new Error('it holds no notes');
-  return notes.map((note: Partial<Note> | null) => ({ time: Number(note?.time ?? NaN), text: String(note?.text ?? '') }));
+  return notes.map((note: Partial<Note> | null) => ({ time: typeof note?.time === 'number' ? note.time : NaN, text: String(note?.text ?? '') }));
 }
 
 function fromCSV(text: string): Note[] {
@@ -57,6 +60,11 @@ export function secondsOf(clock: string): number {
 
 /// Those of both, each once.
 export function joined(notes: Note[], more: Note[]): Note[] {
-  const known = new Set(notes.map(({ time, text }) => `${time} ${text}`));
-  return sortedNotes([...notes, ...more.filter(({ time, text }) => !known.has(`${time} ${text}`))]);
+  const known = new Set(notes.map(nameOf));
+  const isNew = (note: Note) => !known.has(nameOf(note)) && known.add(nameOf(note));
+  return sortedNotes([...notes, ...more.filter(isNew)]);
+}
+
+function nameOf({ time, text }: Note): string {
+  return `${time} ${text}`;
 }

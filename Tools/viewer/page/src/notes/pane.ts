@@ -21,7 +21,10 @@ const formats: [NotesFormat, string, string][] = [
   ['md', 'Markdown', 'text/markdown'],
 ];
 
+const mostBytes = 8_000_000; // of a file of notes
+
 export class NotesPane {
+  private isWarned = false;
   private session: Session | undefined;
   private notes: Note[] = [];
   private readonly list = make('ol', { class: 'notes' });
@@ -86,7 +89,11 @@ export class NotesPane {
 
   private keep(told: string): void {
     const { notes } = this;
-    store(this.key, notes.length > 0 ? notesText(notes, this.session?.name ?? '', 'json') : null);
+    const isKept = store(this.key, notes.length > 0 ? notesText(notes, this.session?.name ?? '', 'json') : null);
+    if (!isKept && !this.isWarned) {
+      this.isWarned = true;
+      this.events.onProblem('This browser does not keep notes for the next visit. Save them as a file before you leave.');
+    }
     announce(told);
     this.events.onChange();
   }
@@ -134,14 +141,19 @@ export class NotesPane {
 
   private async import(): Promise<void> {
     const [file] = this.file.files ?? [];
+    const { session } = this;
     this.file.value = '';
     if (!file) return;
     try {
+      if (file.size > mostBytes) throw new Error('it is larger than any file of notes');
       const notes = notesIn(await file.text());
-      this.change(joined(this.notes, notes), `${plural(notes.length, 'note')} imported`);
-    } catch {
+      if (session !== this.session) return; // they are about the recording before
+      const all = joined(this.notes, notes);
+      this.change(all, `${plural(all.length - this.notes.length, 'note')} imported`);
+    } catch (error) {
+      const reason = error instanceof Error && error.message.startsWith('it ') ? error.message : 'it holds no notes';
       this.events.onProblem(
-        `${file.name} holds no notes. Choose a JSON, CSV or Markdown file that was saved by a page like this one.`,
+        `${reason.replace('it', () => file.name)}. Choose a JSON, CSV or Markdown file that was saved by a page like this one.`,
       );
     }
   }
