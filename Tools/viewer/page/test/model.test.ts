@@ -1,6 +1,7 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
 import type { Column, Entries, Table } from '#decoder';
+import { lanesOf } from '../src/lanes/lanes';
 import { appearancesIn } from '../src/model/appearances';
 import { clickLabel, clicksAround, clicksIn } from '../src/model/clicks';
 import { bytes, clock, plural, spokenTime, titleOf } from '../src/model/format';
@@ -140,6 +141,13 @@ test('idle times are what the library tells', () => {
   assert.deepEqual(idleIn(undefined, 20), []);
   const early = { kind: 'idle', time: Float64Array.of(-10), columns: { end: Float64Array.of(4) } };
   assert.deepEqual(idleIn(early, 20), [{ start: 0, end: 4 }], 'an offset moved it before the movie');
+});
+
+test('hidden characters of a note show themselves in its lane', () => {
+  const notes = () => [{ time: 1, text: 'invoice\u202efdp.exe' }];
+  const region = () => ({ x: 0, y: 0, width: 10, height: 10 });
+  const lane = lanesOf(session([]), { showsKeys: () => false, region, notes }).find(({ title }) => title === 'Notes');
+  assert.equal(lane?.valueAt(1.2), 'invoice[U+202E]fdp.exe');
 });
 
 test('the last region with an area is the recorded one, and the movie says how long it is', () => {

@@ -2,7 +2,7 @@
 
 import { clickLabel, type Click } from '../model/clicks';
 import { StreamRows } from '../entries/rows';
-import { brief, titleOf } from '../model/format';
+import { brief, shown, titleOf } from '../model/format';
 import { Extremes } from '../model/extremes';
 import { keyCap } from '../model/keys';
 import type { Rect } from '../model/geometry';
@@ -67,11 +67,11 @@ function notesLane({ duration }: Session, { notes }: LaneOptions): NamelessLane 
       drawBands(canvas, times, (index) => {
         const { bands, bandEdges } = canvas.palette;
         const [start, end] = [times[index]!, times[index + 1] ?? duration];
-        return { start, end, text: all[index]!.text, colour: bands[2]!, edge: bandEdges[2]! };
+        return { start, end, text: shown(all[index]!.text), colour: bands[2]!, edge: bandEdges[2]! };
       }),
     valueAt: (time) => {
       const index = lastAt(times, time);
-      return index >= 0 && time - times[index]! < noteEnd ? all[index]!.text : '';
+      return index >= 0 && time - times[index]! < noteEnd ? shown(all[index]!.text) : '';
     },
   };
 }

@@ -128,6 +128,7 @@ export class NotesPane {
   /// An empty note is removed. Any other keeps its element: the button that the reader presses next has to stay there.
   private rewrite(note: Note, text: string): void {
     if (!text) return this.change(this.notes.filter((other) => other !== note), 'Note removed');
+    if (text === shown(note.text)) return; // the field shows hidden characters, which the note keeps
     note.text = text;
     this.keep('Note changed');
   }
