@@ -60,3 +60,12 @@ test('a file of notes has bounds, and its times are numbers', () => {
   const note = { time: 1, text: 'twice' };
   assert.deepEqual(joined([], [note, { ...note }]), [note]);
 });
+
+test('notes keep their times below zero, and their lines', () => {
+  const early = [{ time: -7.5, text: 'one\u2028two' }, { time: 0.0000001, text: 'late' }];
+  assert.deepEqual(notesIn(notesText(early, 'A.mp4', 'md')), [early[0], { time: 0, text: 'late' }]);
+  assert.equal(notesText(early, 'A.mp4', 'csv'), 'time,text\n-7.5,one\u2028two\n0,late\n');
+  assert.deepEqual(notesIn('time,text\r-7.5,one\r'), [{ time: -7.5, text: 'one' }]);
+  const [exact] = notesIn(notesText([{ time: 1.2344, text: 'note' }], 'A.mp4', 'md'));
+  assert.equal(joined([{ time: 1.2344, text: 'note' }], [exact!]).length, 1, 'Markdown has fewer digits');
+});

@@ -56,12 +56,21 @@ const mostHidden = 12;
 
 const noteEnd = 0.6; // seconds after which a note is no longer that of the playhead
 
+/// Returns the lanes with the notes as they are now.
+export function withNotes(lanes: Lane[], session: Session, options: LaneOptions): Lane[] {
+  const notes = notesLane(session, options);
+  const others = lanes.filter(({ id }) => id !== notesTitle);
+  return notes ? [{ ...notes, id: notesTitle }, ...others] : others;
+}
+
+const notesTitle = 'Notes';
+
 function notesLane({ duration }: Session, { notes }: LaneOptions): NamelessLane | undefined {
   const all = notes();
   if (all.length === 0) return undefined;
   const times = Float64Array.from(all, ({ time }) => time);
   return {
-    title: 'Notes',
+    title: notesTitle,
     height: 23,
     draw: (canvas) =>
       drawBands(canvas, times, (index) => {

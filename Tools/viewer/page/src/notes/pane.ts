@@ -5,6 +5,7 @@ import { joined, notesIn, notesText, sortedNotes, type Note, type NotesFormat } 
 import type { Session } from '../model/session';
 import { announce, byId, make, setText } from '../ui/dom';
 import { setIcon } from '../ui/icons';
+import { saveText } from '../ui/save';
 import { store, stored } from '../ui/storage';
 
 export interface NotesEvents {
@@ -26,7 +27,9 @@ const mostBytes = 8_000_000; // of a file of notes
 export class NotesPane {
   private isWarned = false;
   private session: Session | undefined;
+  /// At times of the movie. The browser keeps them at times of the recording.
   private notes: Note[] = [];
+  private offset = 0;
   private readonly list = make('ol', { class: 'notes' });
   private readonly status = make('output', { class: 'notes-status', 'aria-live': 'polite' });
   private readonly field = make('input', {
@@ -57,10 +60,20 @@ export class NotesPane {
     return this.notes;
   }
 
-  show(session: Session): void {
-    this.session = session;
-    this.notes = this.remembered();
+  /// `offset` is added to the times of the recording.
+  show(session: Session, offset: number): void {
+    [this.session, this.offset] = [session, offset];
+    this.notes = moved(this.remembered(), offset);
     this.fill();
+  }
+
+  /// Notes belong to the recording, and move with it.
+  setOffset(offset: number): void {
+    if (offset === this.offset) return;
+    this.notes = moved(this.notes, offset - this.offset);
+    this.offset = offset;
+    this.fill();
+    this.events.onChange();
   }
 
   focusField(): void {
@@ -88,7 +101,7 @@ export class NotesPane {
   }
 
   private keep(told: string): void {
-    const { notes } = this;
+    const notes = moved(this.notes, -this.offset);
     const isKept = store(this.key, notes.length > 0 ? notesText(notes, this.session?.name ?? '', 'json') : null);
     if (!isKept && !this.isWarned) {
       this.isWarned = true;
@@ -135,9 +148,7 @@ export class NotesPane {
 
   private save(format: NotesFormat, type: string): void {
     const name = this.session?.name ?? 'Recording';
-    const url = URL.createObjectURL(new Blob([notesText([...this.notes], name, format)], { type }));
-    make('a', { href: url, download: `${name} notes.${format}` }).click();
-    setTimeout(() => URL.revokeObjectURL(url), 10_000);
+    saveText(`${name} notes.${format}`, notesText(this.notes, name, format), type);
   }
 
   private async import(): Promise<void> {
@@ -158,6 +169,10 @@ export class NotesPane {
       );
     }
   }
+}
+
+function moved(notes: Note[], offset: number): Note[] {
+  return notes.map(({ time, text }) => ({ time: Number((time + offset).toFixed(6)), text }));
 }
 
 function button(

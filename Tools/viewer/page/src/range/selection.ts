@@ -39,20 +39,34 @@ export class Selection {
     this.changed();
   }
 
+  /// The heat map tells of the range no longer.
+  dropHeat(): void {
+    if (!this.hasHeat) return;
+    this.hasHeat = false;
+    this.onChange();
+  }
+
   clear(): void {
     this.selected = undefined;
     this.changed();
   }
 
-  /// The range begins at `time`. Its end stays if it is later.
-  setIn(time: number): void {
+  /// The range begins at `time`. Its end stays if it is later. Returns false if nothing is left to select.
+  setIn(time: number): boolean {
     const { to } = this.selected ?? { to: this.duration };
-    this.select(time, to > time ? to : this.duration);
+    return this.selectSome(time, to > time ? to : this.duration);
   }
 
-  setOut(time: number): void {
+  /// The range ends at `time`, as `setIn` begins it.
+  setOut(time: number): boolean {
     const { from } = this.selected ?? { from: 0 };
-    this.select(from < time ? from : 0, time);
+    return this.selectSome(from < time ? from : 0, time);
+  }
+
+  private selectSome(from: number, to: number): boolean {
+    if (to - from < shortest) return false;
+    this.select(from, to);
+    return true;
   }
 
   /// The selection ends at `time`. A new one begins at `start`.

@@ -101,6 +101,12 @@ export class Player {
     return this.movie !== 'loading' && this.wanted === undefined && !this.isStepping;
   }
 
+  /// Resolves when the movie shows the picture of `time`.
+  async settled(): Promise<void> {
+    await this.arrival();
+    await this.stepping;
+  }
+
   get rate(): number {
     return this.speed;
   }
@@ -214,6 +220,7 @@ export class Player {
   /// Shows the picture that the clock has reached as soon as the one before has been found.
   private goBack(passed: number): void {
     this.target = this.limited(this.target - Math.max(0, passed) * this.backward);
+    if (this.loop && this.target <= this.loop.from) [this.target, this.picture] = [this.loop.to, NaN]; // to be looked for
     if (this.movie !== 'ready' || this.target > this.movieLength()) this.position = this.target;
     else if (this.wanted === undefined && !(this.target >= this.picture)) this.seekMovie(inside(this.target));
     if (this.target > 0) return;
