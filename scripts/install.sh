@@ -12,6 +12,8 @@ consumers=(clang make pkg-config binutils)
 record=(libx11-dev libxtst-dev libxcb1-dev libxcb-shm0-dev libxcb-xfixes0-dev libxcb-xinput-dev libxcb-randr0-dev libxcb-composite0-dev
     libxcb-xkb-dev libxkbcommon-dev libxkbcommon-x11-dev libavcodec-dev libavformat-dev libavutil-dev libswscale-dev
     libpulse-dev libatspi2.0-dev)
+render=(libavcodec-dev libavfilter-dev libavformat-dev libavutil-dev libswresample-dev libswscale-dev libcairo2-dev
+    libpango1.0-dev fonts-dejavu-core)
 desktop=(xvfb openbox xdotool xterm x11-utils x11-xserver-utils x11-xkb-utils xkb-data at-spi2-core dbus ffmpeg python3)
 python=(python3-dev python3-numpy python3-pybind11 pybind11-dev python3-pip python3-setuptools python3-wheel python3-pytest
     python3-matplotlib mypy)

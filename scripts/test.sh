@@ -7,7 +7,7 @@ cd "$(dirname "$0")/.."
 preset=${1:-dev}
 
 viewer=()
-scripts/install.sh build media test record desktop
+scripts/install.sh build media test record render desktop
 [ "$preset" != dev ] || scripts/install.sh consumers python
 case "$preset" in
     dev | release) scripts/install.sh viewer browser && viewer=(-DZULM_BUILD_VIEWER=ON) ;; # others leave it out

@@ -58,8 +58,9 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
     }
     EXPECT_THAT(commands,
                 testing::UnorderedElementsAre("atoms", "attach", "compact", "cut", "detach", "diff", "dump", "edits",
-                                              "extract", "grep", "info", "insights", "record", "redact", "repair",
-                                              "retime", "salvage", "stamp", "state", "verify", "view"));
+                                              "extract", "grep", "info", "insights", "record", "redact", "redactions",
+                                              "repair", "retime", "salvage", "stamp", "state", "style", "verify",
+                                              "view", "zooms"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {

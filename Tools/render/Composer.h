@@ -1,0 +1,56 @@
+#pragma once
+
+// Draws the frames of a film.
+//
+//     Composer composer(session, pictures, stage, style);
+//     writer.write(composer.frameAt(session.times().at(1.5)));
+
+#include "Tools/render/Backdrop.h"
+#include "Tools/render/FilmSession.h"
+#include "Tools/render/Layers.h"
+#include "Tools/render/PictureReader.h"
+
+#include <chrono>
+#include <functional>
+
+namespace Render {
+
+/// Changes a picture of the movie before it is drawn, such as by covering a part of it. Returns false if it leaves the
+/// picture as it is.
+using Retouch = std::function<bool(YuvPicture& picture, double time)>;
+
+class Composer {
+public:
+    /// Everything that is passed must outlive this.
+    Composer(FilmSession& session, PictureReader& pictures, const Stage& stage, const Style& style,
+             Retouch retouch = {});
+
+    /// Returns what the film shows at a time. Its bytes are its own.
+    const YuvPicture& frameAt(const FilmTime& time);
+
+    /// The same for a picture that stands still: the rings of clicks are half grown.
+    YuvPicture stillAt(const FilmTime& time);
+
+    /// How long drawing has taken so far, without decoding.
+    std::chrono::duration<double> drawingTime() const { return drawing_; }
+
+private:
+    void drawMovie(const FilmTime& time, const View& view);
+    void drawFrame(const FilmTime& time, bool isStill);
+
+    FilmSession& session_;
+    PictureReader& pictures_;
+    Stage stage_;
+    Style style_;
+    Retouch retouch_;
+    Backdrop backdrop_;
+    CursorLayer cursor_;
+    CaptionLayer captions_;
+    YuvPicture base_; ///< the movie on its background, which serves as long as neither the picture nor the view changes
+    YuvPicture frame_;
+    PicturePart shownPart_;
+    std::uint64_t shownPicture_ = 0;
+    std::chrono::duration<double> drawing_{};
+};
+
+} // namespace Render

@@ -1,0 +1,160 @@
+#include "Tools/render/Film.h"
+
+#include "Tools/render/Gif.h"
+#include "Tools/render/Production.h"
+#include "Tools/render/SoundTrack.h"
+#include "Tools/render/Stills.h"
+#include "Tools/zulm/FileAccess.h"
+#include "Tools/zulm/Interruptions.h"
+#include "Tools/zulm/OutputFile.h"
+#include "Tools/zulm/Progress.h"
+#include "Tools/zulm/Settings.h"
+#include "Tools/zulm/StandardStreams.h"
+#include "ZULMetaDataBridge/Source/SafeMovieSave.h"
+
+#include <fmt/core.h>
+
+#include <algorithm>
+#include <chrono>
+#include <filesystem>
+
+namespace Render {
+
+using namespace ZULMetaData;
+using Zulm::ExitCode;
+using Zulm::Failure;
+
+namespace {
+
+constexpr int s_gifWidth = 960; ///< at most, unless a size is asked for
+constexpr double s_gifFps = 12;
+constexpr int s_paletteFrames = 24;
+
+EditList editsFor(const RenderOptions& options, const Production& production) {
+    if (options.idle)
+        return production.withoutIdle(*options.idle, options.rest);
+    const Zulm::EditOptions& edits = options.edits;
+    const bool isCut = !edits.file.empty() || !edits.kept.empty() || !edits.removed.empty();
+    return isCut ? Zulm::editsOf(edits, production.recording()) : production.whole();
+}
+
+/// Calls `draw(frame)` with all frames of the film, and shows progress.
+template <class Draw>
+void drawFrames(Production& production, double fps, const std::string& name, Draw draw) {
+    const Zulm::NotedSignals noted;
+    const TimeMap& times = production.session().times();
+    const std::int64_t count = times.frames(fps);
+    Zulm::Progress progress("rendering " + name, static_cast<std::uint64_t>(times.duration() * 1000),
+                            Zulm::secondsText);
+    for (std::int64_t frame = 0; frame < count; ++frame) {
+        Zulm::NotedSignals::check();
+        const double time = static_cast<double>(frame) / fps;
+        draw(production.composer().frameAt(times.at(time)), static_cast<double>(frame + 1) / fps);
+        progress.moveTo(static_cast<std::uint64_t>(time * 1000));
+    }
+}
+
+void attachStreams(Production& production, const std::string& movie, const std::string& name) {
+    try {
+        SafeMovieSave(movie).attach(production.streams());
+    } catch (const SaveError& error) {
+        throw Failure(fmt::format("{}: {}; nothing was written", name, error.sentence()));
+    }
+}
+
+ExitCode complainAbout(const EditedRecording& edited, const std::string& recording) {
+    for (const std::string& warning : edited.warnings)
+        Zulm::warn(fmt::format("{}: {}", recording, warning));
+    for (const std::string& loss : edited.losses)
+        Zulm::complain(fmt::format("{}: {}", recording, loss));
+    return edited.losses.empty() ? Zulm::ExitFine : Zulm::ExitDamaged;
+}
+
+void sayTimes(const Composer& composer, std::chrono::duration<double> whole, double length) {
+    Zulm::say(fmt::format("{:.2f} s for {:.2f} s of film, of which drawing took {:.2f} s ({:.0f} %)", whole.count(),
+                          length, composer.drawingTime().count(), 100 * composer.drawingTime() / whole));
+}
+
+ExitCode renderFilm(const RenderOptions& options, Production& production, const EditList& edits) {
+    FilmWriter::requireCodec(options.film.codec);
+    Zulm::OutputFile output(options.output, {options.recording, options.edits.file, options.style}, options.force);
+    FilmSettings settings = options.film;
+    std::unique_ptr<SoundTrack> sound;
+    if (!options.isSilent)
+        sound = std::make_unique<SoundTrack>(production.path(), options.recording, edits);
+    if (sound && sound->hasSound())
+        settings.soundRate = sound->rate();
+    const auto begin = std::chrono::steady_clock::now();
+    const double length = production.session().times().duration();
+    FilmWriter writer(output.temporaryPath(), options.output, settings, production.size().width,
+                      production.size().height,
+                      production.pictures().at(production.session().times().at(0).source).matrix());
+    drawFrames(production, settings.fps, options.output, [&](const YuvPicture& picture, double end) {
+        writer.writePicture(picture);
+        if (settings.soundRate > 0)
+            writer.writeSound(sound->readUntil(std::min(end, length)));
+    });
+    writer.finish();
+    sayTimes(production.composer(), std::chrono::steady_clock::now() - begin, length);
+    const EditedRecording& edited = production.session().edited();
+    if (!edited.streams.empty())
+        attachStreams(production, output.temporaryPath(), options.output);
+    output.commit();
+    if (!Zulm::settings().quiet)
+        Zulm::writeOutput(fmt::format("{}: {:.3f} s, {} x {}, {} stream{}\n", options.output, length,
+                                      production.size().width, production.size().height, edited.streams.size(),
+                                      edited.streams.size() == 1 ? "" : "s"));
+    return complainAbout(edited, options.recording);
+}
+
+ExitCode renderGif(const RenderOptions& options, Production& production) {
+    const double fps = options.hasFps ? options.film.fps : s_gifFps;
+    const FilmSize& size = production.size();
+    const TimeMap& times = production.session().times();
+    Zulm::OutputFile output(options.output, {options.recording, options.edits.file, options.style}, options.force);
+    GifPalette palette(size.width, size.height);
+    const int samples = static_cast<int>(std::min<std::int64_t>(s_paletteFrames, times.frames(fps)));
+    for (int i = 0; i < samples; ++i)
+        palette.add(production.composer().frameAt(times.at(times.duration() * i / samples)));
+    GifWriter writer(output.temporaryPath(), options.output, size.width, size.height, fps, palette.take());
+    drawFrames(production, fps, options.output,
+               [&writer](const YuvPicture& picture, double) { writer.writePicture(picture); });
+    writer.finish();
+    output.commit();
+    return Zulm::ExitFine;
+}
+
+ExitCode renderStills(const RenderOptions& options, Production& production) {
+    namespace fs = std::filesystem;
+    const TimeMap& times = production.session().times();
+    Zulm::createFolder(options.frames);
+    std::vector<std::string> paths;
+    for (const double time : options.at) {
+        if (time > times.duration())
+            throw Failure(fmt::format("--at {}: the film ends at {:.3f} s", time, times.duration()));
+        paths.push_back((fs::path(options.frames) / fmt::format("frame-{:09.3f}.png", time)).string());
+    }
+    Zulm::requireFree(paths, options.force);
+    for (std::size_t i = 0; i < paths.size(); ++i)
+        writePng(production.composer().frameAt(times.at(options.at[i])), paths[i], options.recording, true);
+    return Zulm::ExitFine;
+}
+
+} // namespace
+
+ExitCode render(const RenderOptions& options) {
+    Production production(options);
+    if (production.recording().streams().empty()) {
+        Zulm::complain(fmt::format("{}: has no recording metadata, from which a cursor could be drawn; nothing was "
+                                   "written",
+                                   options.recording));
+        return Zulm::ExitNoMetaData;
+    }
+    const EditList edits = editsFor(options, production);
+    production.prepare(edits, options.zoom, options.isGif ? s_gifWidth : 1 << 20);
+    if (!options.frames.empty())
+        return renderStills(options, production);
+    return options.isGif ? renderGif(options, production) : renderFilm(options, production, edits);
+}
+
+} // namespace Render
