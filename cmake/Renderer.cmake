@@ -1,4 +1,4 @@
-# Sets ZULMETADATA_RENDERER where the renderer is built, and makes the target ZULMETADATA_RENDERER_LIBRARIES of what it
+# Sets ZULMETADATA_RENDERER if the renderer can be built, and makes the target ZULMETADATA_RENDERER_LIBRARIES of what it
 # needs.
 set(ZULMETADATA_RENDERER OFF)
 if(NOT ZULMETADATA_BUILD_RENDERER OR NOT ZULMETADATA_BUILD_TOOLS OR NOT CMAKE_SYSTEM_NAME STREQUAL "Linux"

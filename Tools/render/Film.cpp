@@ -15,7 +15,7 @@
 #include <fmt/core.h>
 
 #include <algorithm>
-#include <chrono>
+#include <ctime>
 #include <filesystem>
 
 namespace Render {
@@ -70,9 +70,13 @@ ExitCode complainAbout(const EditedRecording& edited, const std::string& recordi
     return edited.losses.empty() ? Zulm::ExitFine : Zulm::ExitDamaged;
 }
 
-void sayTimes(const Composer& composer, std::chrono::duration<double> whole, double length) {
-    Zulm::say(fmt::format("{:.2f} s for {:.2f} s of film, of which drawing took {:.2f} s ({:.0f} %)", whole.count(),
-                          length, composer.drawingTime().count(), 100 * composer.drawingTime() / whole));
+/// How much of the work was drawing. The times are those of processors, so that other programs do not count.
+void sayTimes(const Composer& composer, double length) {
+    timespec time{};
+    clock_gettime(CLOCK_PROCESS_CPUTIME_ID, &time);
+    const double whole = static_cast<double>(time.tv_sec) + static_cast<double>(time.tv_nsec) * 1e-9;
+    Zulm::say(fmt::format("{:.2f} s of processors for {:.2f} s of film, of which drawing took {:.2f} s ({:.0f} %)",
+                          whole, length, composer.drawingTime(), 100 * composer.drawingTime() / whole));
 }
 
 ExitCode renderFilm(const RenderOptions& options, Production& production, const EditList& edits) {
@@ -84,7 +88,6 @@ ExitCode renderFilm(const RenderOptions& options, Production& production, const 
         sound = std::make_unique<SoundTrack>(production.path(), options.recording, edits);
     if (sound && sound->hasSound())
         settings.soundRate = sound->rate();
-    const auto begin = std::chrono::steady_clock::now();
     const double length = production.session().times().duration();
     FilmWriter writer(output.temporaryPath(), options.output, settings, production.size().width,
                       production.size().height,
@@ -95,7 +98,7 @@ ExitCode renderFilm(const RenderOptions& options, Production& production, const 
             writer.writeSound(sound->readUntil(std::min(end, length)));
     });
     writer.finish();
-    sayTimes(production.composer(), std::chrono::steady_clock::now() - begin, length);
+    sayTimes(production.composer(), length);
     const EditedRecording& edited = production.session().edited();
     if (!edited.streams.empty())
         attachStreams(production, output.temporaryPath(), options.output);

@@ -30,7 +30,7 @@ struct ShownClick {
 };
 
 /// Positions and clicks are those of the recording, because the cursor must be where the picture shows what it does.
-/// Captions and the camera follow the streams of the edited movie, so that they stay calm where it is faster.
+/// Captions and the camera follow the streams of the edited movie, so that they stay calm at every speed.
 class FilmSession {
 public:
     /// Calls `leaveOut` for streams that cannot be read. The recording must outlive this. `movie` is the size of its

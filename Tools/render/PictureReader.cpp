@@ -149,9 +149,9 @@ void PictureReader::advance(double time) {
 }
 
 const YuvPicture& PictureReader::at(double time) {
-    const bool isBehind = current_ && current_->time > time + s_rounding;
+    const bool isEarlier = current_ && current_->time > time + s_rounding;
     const bool isFar = following_ && time - following_->time > s_farAhead;
-    if (isBehind || isFar)
+    if (isEarlier || isFar)
         seek(time);
     advance(time);
     for (double earlier = 1; current_ && current_->time > time + s_rounding && time > 0 && earlier < 1e6;

@@ -115,12 +115,16 @@ void Production::prepare(const EditList& edits, const std::string& zoom, int lar
                                              [](const Error& error) { Zulm::warn(error.what()); });
     if (!zoom.empty() && zoom != "auto" && zoom != "off")
         session_->setZooms(readZooms(zoom, session_->region()));
-    Retouch retouch;
-    if (!redactions_.empty())
-        retouch = [this](YuvPicture& picture, double time) {
+    Cover cover;
+    if (!redactions_.empty()) {
+        cover.picture = [this](YuvPicture& picture, double time) {
             return redactions_.cover(picture, time, session_->region());
         };
-    composer_ = std::make_unique<Composer>(*session_, pictures_, *stage_, style_, retouch);
+        cover.hides = [this](const ScreenPoint& position, double time) {
+            return redactions_.hidesCursor(position, time);
+        };
+    }
+    composer_ = std::make_unique<Composer>(*session_, pictures_, *stage_, style_, cover);
 }
 
 std::string Production::shownRegion(const ByteSource& stored) const {

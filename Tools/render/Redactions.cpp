@@ -18,6 +18,7 @@ using namespace ZULMetaData;
 namespace {
 
 constexpr double s_rounding = 0.001; ///< seconds: movies round their times by less
+constexpr double s_cursor = 48;      ///< units of the display that a cursor reaches from its hot spot
 constexpr double s_titleBar = 48;    ///< units of the display around the upper edge of a window
 
 ScreenRect screenRect(const Rect& rect) {
@@ -176,6 +177,13 @@ bool Redactions::cover(YuvPicture& picture, double time, const ScreenRect& regio
         picture.fill({left, top, right - left, bottom - top}, {0, 0, 0, 1});
     }
     return isCovered;
+}
+
+bool Redactions::hidesCursor(const ScreenPoint& position, double time) const {
+    return std::any_of(places_.begin(), places_.end(), [&](const CoveredPlace& place) {
+        return time >= place.from - s_rounding && time <= place.to + s_rounding &&
+               touches(place.area, {position.x - s_cursor, position.y - s_cursor, 2 * s_cursor, 2 * s_cursor});
+    });
 }
 
 RedactedStreams Redactions::redacted(const Recording& recording) const {

@@ -38,6 +38,10 @@ public:
     /// nothing is covered, and leaves the picture as it is. Else the picture gets bytes of its own.
     bool cover(YuvPicture& picture, double time, const ZULMetaData::ScreenRect& region) const;
 
+    /// Returns whether a cursor at this point would touch what is covered at a time. Where it is then is not known: it
+    /// must not be drawn on its way between two positions that are.
+    bool hidesCursor(const ZULMetaData::ScreenPoint& position, double time) const;
+
     /// Returns the streams without what lies in the places at their times: positions, clicks and scrolling of a cursor
     /// that is there; keys while the window on top touches a place or is not known; the title and application of a
     /// window whose upper edge is there; rectangles of windows and controls; all texts of slides. Streams that cannot

@@ -41,7 +41,7 @@ void readBackground(JsonFields& reader, Style::Background& background) {
     readColour(reader, "background.color", background.from);
     if (reader.has("background.to")) {
         if (!reader.has("background.color"))
-            reader.failAt("background.to", "needs \"background.color\", where the gradient begins");
+            reader.failAt("background.to", "needs \"background.color\", the other end of the gradient");
         background.to.emplace();
         readColour(reader, "background.to", *background.to);
     }

@@ -200,7 +200,7 @@ class Sound(Films):
     def test_sound_stays_with_the_pictures_at_speeds(self):
         self.beeps(12)
         run(self.movie, "-o", self.film, "--style", self.style(), "--fps", self.FPS, "--keep", "0-4@2", "--keep", "4-8",
-            "--keep", "8-12@4/5")
+            "--keep", "8-12@2/3")
         self.check(12)
 
     def test_sound_is_as_long_as_the_pictures(self):
@@ -365,7 +365,8 @@ class Hostile(Films):
             "cursorAction": [(0.1, 1), (0.55, 2), (0.7, 256), (0.8, 77)],
             "cursorImage": [(0, 1, png(1500, 1500, (255, 0, 0, 255)), far, -far), (0.2, 2, b"nothing", 0, 0),
                             (0.4, 3, b"", 0, 0), (0.5, 4, png(1, 1, (1, 2, 3, 4)), -far, far)]})
-        run(self.movie, "-o", self.film, "--style", "product")
+        done = run(self.movie, "-o", self.film, "--style", "product", check=False)
+        self.assertEqual(done.returncode, 3, done.stderr) # an entry without a time is left out
         self.assertAlmostEqual(duration_of(self.film), 1, delta=0.04)
 
     def test_a_damaged_movie_makes_a_film_or_an_error(self):
@@ -395,6 +396,7 @@ class Redaction(Films):
         attach(self.movie, {
             "recordingRegion": [(0, 0, 0, 320, 240)],
             "cursorLocation": [(0, 10, 10), (1.5, 150, 110), (2.5, 160, 120), (3.5, 20, 20)],
+            "cursorImage": [(0, 1, png(1, 1, (0, 0, 0, 0)), 0, 0)],
             "cursorAction": [(0.5, 1), (0.6, 2), (2, 1), (2.1, 2), (3.6, 1), (3.7, 2)],
             "keyboardAction": [(0.2, 65, 0), (1.8, 66, 0), (3.8, 67, 0)],
             "topmostWindow": [(0, 0, 0, 50, 50), (1.4, 90, 90, 120, 100), (3.2, 0, 0, 50, 50)],
@@ -431,6 +433,40 @@ class Redaction(Films):
         done = run(self.movie, "-o", self.film, "--redact", self.file, check=False)
         self.assertEqual(done.returncode, 1)
         self.assertIn('line 3: "places[0]" has no "to"', done.stderr)
+
+
+class Golden(Films):
+    """The styles look as they looked. ZULM_WRITE_GOLDEN=1 writes the pictures that this compares with.
+
+    Encoders and decoders differ a little: on average a value of a pixel is at most 2 of 255 away, and at most one pixel
+    in a hundred is more than 24 away."""
+
+    FOLDER = pathlib.Path(__file__).resolve().parents[2] / "Data" / "golden" / "films"
+
+    def setUp(self):
+        super().setUp()
+        picture = bytes((x // 2 + y) % 200 + 30 if (x // 20 + y // 20) % 2 else 220 for y in range(360) for x in range(640))
+        encode(self.movie, 640, 360, 30, [picture] * 120)
+        attach(self.movie, {
+            "recordingRegion": [(0, 0, 0, 640, 360)],
+            "cursorLocation": [(i / 30, 200 + i, 150 + i // 2) for i in range(120)],
+            "cursorAction": [(1, 1), (1.15, 2), (3, 4), (3.1, 8)],
+            "cursorImage": [(0, 1, png(16, 16, (255, 60, 20, 200)), 3, 3)]})
+
+    def test_styles_look_as_they_did(self):
+        for style in ("plain", "product"):
+            stills = self.folder / style
+            run(self.movie, "--frames", stills, "--at", "0.2,1.2,2", "--style", style)
+            for still in sorted(stills.iterdir()):
+                golden = self.FOLDER / f"{style}-{still.name}"
+                if os.environ.get("ZULM_WRITE_GOLDEN"):
+                    self.FOLDER.mkdir(exist_ok=True)
+                    golden.write_bytes(still.read_bytes())
+                now, then = (ffmpeg("-i", file, "-f", "rawvideo", "-pix_fmt", "rgb24", "-") for file in (still, golden))
+                self.assertEqual(len(now), len(then))
+                off = [abs(a - b) for a, b in zip(now, then)]
+                self.assertLess(sum(off) / len(off), 2, golden.name)
+                self.assertLess(sum(value > 24 for value in off) / len(off), 0.01, golden.name)
 
 
 class Guide(Films):
