@@ -41,7 +41,8 @@ int main(int argc, char** argv) {
     try {
         return run(command, {argv + std::min(argc, 2), argv + argc});
     } catch (const CLI::ParseError& error) {
-        Zulm::complain(fmt::format("{}\n'zulm {} --help' shows what can be given", error.what(), command));
+        Zulm::complain(error.what());
+        Zulm::complain(fmt::format("'zulm {} --help' shows what can be given", command));
         return Zulm::ExitUsage;
     } catch (const Zulm::Interruption& interruption) {
         Zulm::complain("interrupted; nothing was written");
