@@ -62,7 +62,6 @@ FilmSession::FilmSession(const Recording& recording, const EditList& edits, cons
     sources.screen = region_;
     clicks_ = clicksOf(sources.actions, sources.positions, sources.duration);
     positions_ = sources.positions;
-    usualDistance_ = usualDistance(positions_.times());
     path_ = CursorPath(positions_, clicks_);
     moves_ = movesIn(sources.positions, clicks_);
 
@@ -89,8 +88,10 @@ void FilmSession::setZooms(const std::vector<Zoom>& zooms) {
 }
 
 std::optional<ScreenPoint> FilmSession::positionAt(double time) const {
-    const auto raw = cursorPositionAt(positions_, time, Interpolation::Linear, usualDistance_);
-    return raw && style_.cursor.isSmooth && !path_.empty() ? path_.at(time) : raw;
+    const Point* recorded = positions_.at(time);
+    if (!recorded)
+        return std::nullopt;
+    return style_.cursor.isSmooth ? path_.at(time) : ScreenPoint(*recorded);
 }
 
 double FilmSession::visibilityAt(double time) const {

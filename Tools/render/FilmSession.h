@@ -54,7 +54,9 @@ public:
     ZULMetaData::ScreenRect areaAt(double film) const; ///< what the camera shows
 
 private:
+    /// Returns where the path has the cursor, or else where the last entry says, as the page shows it.
     std::optional<ZULMetaData::ScreenPoint> positionAt(double time) const;
+
     double visibilityAt(double time) const;
 
     Style style_;
@@ -63,7 +65,6 @@ private:
     ZULMetaData::ScreenRect region_;
     std::vector<ZULMetaData::Click> clicks_;
     ZULMetaData::Track<ZULMetaData::CursorLocationKind> positions_;
-    double usualDistance_ = 0;
     ZULMetaData::CursorPath path_;
     std::vector<double> moves_; ///< when the cursor moved or a button was pressed
     ZULMetaData::EditedRecording edited_;
