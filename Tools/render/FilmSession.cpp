@@ -88,7 +88,8 @@ void FilmSession::setZooms(const std::vector<Zoom>& zooms) {
 }
 
 std::optional<ScreenPoint> FilmSession::positionAt(double time) const {
-    const Point* recorded = positions_.at(time);
+    constexpr double rounding = 1e-6; // seconds; times of the film are sums of rounded numbers
+    const Point* recorded = positions_.at(time + rounding);
     if (!recorded)
         return std::nullopt;
     return style_.cursor.isSmooth ? path_.at(time) : ScreenPoint(*recorded);
