@@ -32,24 +32,25 @@ struct Timing {
 /// Medians of interleaved rounds; the ratio is the median of the rounds' own.
 Timing timeSideBySide(const Work& baseline, const Work& library, double units);
 
-/// Prints the row of a ratio. No time is believed where the result is wrong.
+/// Measures and prints the row of a ratio. If the result is wrong, the row says so and tells no time.
 void compare(const Measure& measure, const Work& baseline, const Work& library, double units,
              const std::function<bool()>& isRight);
 
 /// Prints the row of any other figure.
 void reportFigure(const Measure& measure, double figure, const std::string& unit);
 
-/// A row whose result is wrong.
+/// Prints the row of a wrong result.
 void reportWrong(const Measure& measure);
 
-/// The program itself. Given an argument, it measures only what has that text in its task. Gives 1 where a target was
-/// missed by more than a tenth, or a result was wrong.
+/// Runs the program. If there is an argument, it measures only tasks that contain this text. Returns 1 if a target was
+/// missed by more than a tenth, or if a result was wrong.
 int runBenchmarks(int argc, char** argv, const std::function<void()>& all);
 
-/// Whether a task was asked for; not needed in front of `compare`.
+/// Returns whether a task was asked for. `compare` checks it already.
 bool isSelected(const Measure& measure);
 
-/// Of this run, in memory where the machine has a folder for that; removed at the end.
+/// Returns a folder for the files of this run, in memory if the machine has a folder for that. It is removed at the
+/// end.
 const std::string& scratchFolder();
 
 double median(std::vector<double> values);

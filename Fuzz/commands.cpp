@@ -52,6 +52,8 @@ const std::vector<Words> s_commands{
     {"repair", "FILE", "--in-place"},
     {"attach", "FILE", "--from", "MOVIE", "--in-place", "--replace"},
     {"stamp", "FILE", "--in-place", "--creator", "c", "--creator-version", "1"},
+    {"retime", "FILE", "--movie", "MOVIE", "-o", "DIR/out.mp4", "--force", "--keep", "0-2", "--keep", "1-5@3/2"},
+    {"retime", "FILE", "--movie", "FILE", "-o", "DIR/out.mp4", "--force", "--remove", "1-2", "--replace", "--json"},
 };
 
 std::string replaced(std::string word, const std::string& name, const std::string& value) {

@@ -71,6 +71,48 @@ def pictures():
         yield plain_tiff(order, 3, 8, zlib.compress(bytes(6)))
 
 
+def atom(name, *payload):
+    body = b"".join(payload)
+    return struct.pack(">I", 8 + len(body)) + name.encode() + body
+
+
+def numbers(*values):
+    return struct.pack(f">{len(values)}I", *values)
+
+
+def fragmented_movies():
+    """What a recorder of screens leaves that was killed: pictures in short fragments, and perhaps sound."""
+    def track(number, kind, scale):
+        header = atom("tkhd", numbers(3, 0, 0, number, 0, 0), bytes(60))
+        media = atom("mdia", atom("mdhd", numbers(0, 0, 0, scale, 0, 0)), atom("hdlr", numbers(0, 0), kind, bytes(13)),
+                     atom("minf", atom("stbl", atom("stsd", numbers(0, 0)))))
+        return atom("trak", header, media), atom("trex", numbers(0, number, 1, 0, 0, 0))
+
+    def beginning(*tracks):
+        return atom("ftyp", b"isom", bytes(4)) + atom("moov", atom("mvhd", numbers(0, 0, 0, 1000, 0), bytes(80)), *[
+            trak for trak, _ in tracks], atom("mvex", *[defaults for _, defaults in tracks]))
+
+    def fragment(time, *runs):
+        def moof(place):
+            return atom("moof", atom("mfhd", numbers(0, 1)), *[
+                atom("traf", atom("tfhd", numbers(0x20000, number)), atom("tfdt", numbers(0x1000000, 0, time)),
+                     atom("trun", numbers(0x701, len(sizes), place + sum(len(data) for data in before)),
+                          *[numbers(3000, size, 0x2000000 if index == 0 else 0x1010000)
+                            for index, size in enumerate(sizes)]))
+                for number, sizes, before in runs])
+        return moof(len(moof(0)) + 8) + atom("mdat", bytes(sum(sum(sizes) for _, sizes, _ in runs)))
+
+    pictures, sound = track(1, b"vide", 90000), track(2, b"soun", 48000)
+    plain = beginning(pictures) + fragment(0, (1, [3], [])) + fragment(3000, (1, [4, 2, 1], []))
+    yield plain
+    yield plain[:-3]
+    yield beginning(pictures, sound) + fragment(0, (1, [3, 2], []), (2, [5], [bytes(5)]))
+    yield plain.replace(b"moov", b"free").replace(b"moof", b"free", 1) + atom("skip", bytes(12))
+    same = atom("tfhd", numbers(0x20038, 1, 4500, 2, 0)) + atom("tfdt", numbers(0, 0))
+    moof = atom("moof", atom("mfhd", numbers(0, 1)), atom("traf", same, atom("trun", numbers(0x5, 2, 108, 0x2000000))))
+    yield beginning(pictures) + moof + atom("mdat", bytes(4))
+
+
 def movies(streams):
     all_streams = list(streams.values())
     yield recordings.movie(all_streams)
@@ -108,8 +150,10 @@ def seeds(streams):
     yield "raw_scan", bare
     yield "repair", all_movies
     yield "append_walk", bare
+    yield "fragmented_movie", list(fragmented_movies())
     yield "uuid_text", [text.encode() for text in IDENTIFIERS]
     yield "image_decode", list(pictures())
+    yield "recording", all_movies + all_riffs + bare
     yield from edit_list_seeds.seeds()
     files = [(0, movie) for movie in all_movies[:3]] + [(1, all_riffs[0])]
     files += [(2, streams[kind]) for kind in ("cursorImage", "keyboardAction", "slideTitles", "systemData")]

@@ -18,28 +18,29 @@ bool isLockable(int descriptor, int kind) {
     return uninterrupted([=] { return flock(descriptor, kind | LOCK_NB); }) == 0;
 }
 
-} // namespace
-
-LockFile::LockFile(const FileLocation& file, std::string_view note) : LockFile(file, note, createdTemporary(file)) {}
-
-LockFile::LockFile(const FileLocation& file, std::string_view note, const Temporary& temporary)
-    : file_(file), descriptor_(temporary.descriptor) {
-    try {
-        if (isLockable(descriptor_.number(), LOCK_EX)) // an empty file counts as held
-            descriptor_.writeAt(0, {note.data(), note.size()});
-        renameWithoutReplacing(temporary.name, file);
-    } catch (...) {
-        unlink(temporary.name.c_str());
-        throw;
-    }
-}
-
-LockFile::Temporary LockFile::createdTemporary(const FileLocation& file) {
-    std::string name = file.native() + ".XXXXXX"; // which the system replaces
+/// Returns the descriptor of a new file, whose name it completes.
+int createdFile(std::string& name) {
     const int descriptor = uninterrupted([&] { return mkostemp(name.data(), O_CLOEXEC); });
     if (descriptor < 0)
         throwSystemError(errno, "cannot be created");
-    return {name, descriptor};
+    return descriptor;
+}
+
+} // namespace
+
+LockFile::LockFile(const FileLocation& file, std::string_view note) : LockFile(file, note, file.native() + ".XXXXXX") {}
+
+/// Nothing may fail between the creation of the file and `try`: the temporary name would stay.
+LockFile::LockFile(const FileLocation& file, std::string_view note, std::string&& temporary)
+    : file_(file), descriptor_(createdFile(temporary)) {
+    try {
+        if (isLockable(descriptor_.number(), LOCK_EX)) // an empty file counts as held
+            descriptor_.writeAt(0, {note.data(), note.size()});
+        renameWithoutReplacing(temporary, file);
+    } catch (...) {
+        unlink(temporary.c_str());
+        throw;
+    }
 }
 
 LockFile::State LockFile::stateOf(const FileLocation& file) {

@@ -34,13 +34,8 @@ public:
     void remove(); ///< removes the file, if it is still there; without this it is left to others
 
 private:
-    struct Temporary {
-        std::string name;
-        int descriptor;
-    };
-
-    static Temporary createdTemporary(const FileLocation& file);
-    LockFile(const FileLocation& file, std::string_view note, const Temporary& temporary);
+    /// Creates the file under a temporary name, whose last six characters the system replaces.
+    LockFile(const FileLocation& file, std::string_view note, std::string&& temporary);
 
     FileLocation file_;
     Descriptor descriptor_;

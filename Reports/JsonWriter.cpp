@@ -81,6 +81,20 @@ void JsonWriter::element(const Json& value) {
     this->value(value);
 }
 
+JsonWriter JsonWriter::forElements(TextSink sink) const {
+    JsonWriter writer(std::move(sink), style_);
+    writer.open_ = open_;
+    if (!writer.open_.empty())
+        writer.open_.back().isEmpty = true;
+    return writer;
+}
+
+void JsonWriter::joinElements() {
+    if (!open_.back().isEmpty)
+        sink_(",");
+    open_.back().isEmpty = false;
+}
+
 void JsonWriter::endTo(std::size_t depth) {
     while (open_.size() > depth) {
         const Open ended = open_.back();

@@ -42,6 +42,13 @@ public:
 
     void element(const nlohmann::ordered_json& value);
 
+    /// Returns a writer of further elements of the array that is open. `joinElements` says where their text goes.
+    JsonWriter forElements(TextSink sink) const;
+
+    /// Makes the array that is open ready for the text of another writer's elements, which is put where this one's next
+    /// element would be.
+    void joinElements();
+
     /// Writes a whole array: what `documentOf` returns for each item.
     template <class Items, class DocumentOf>
     void array(const std::string& name, const Items& items, DocumentOf documentOf) {

@@ -1,6 +1,7 @@
 #include "ZULMetaDataSession/AbandonedSession.h"
 
 #include "Platform/LockFile.h"
+#include "ZULMetaDataSession/OrError.h"
 #include "ZULMetaDataSession/SessionFolder.h"
 
 #include <filesystem>
@@ -10,7 +11,7 @@ namespace ZULMetaData {
 
 AbandonedSession::AbandonedSession(const FileLocation& folder) : folder_(folder) {
     const std::string name = utf8Path(folder);
-    if (!detail::orSessionError(name, [&] { return std::filesystem::is_directory(folder); }))
+    if (!detail::orError(name, [&] { return std::filesystem::is_directory(folder); }))
         throw Error(name, "is no folder, so it holds no session");
     if (LockFile::stateOf(detail::lockFileIn(folder)) == LockFile::State::Held)
         throw Error(name, "is still in use; finish the recording first");

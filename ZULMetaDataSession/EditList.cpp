@@ -1,6 +1,7 @@
 #include "ZULMetaDataSession/EditList.h"
 
 #include <algorithm>
+#include <cmath>
 #include <utility>
 
 namespace ZULMetaData {
@@ -31,6 +32,8 @@ void requireTime(const char* name, const Rational& time) {
         refuse(std::string(name) + " is negative: " + shownNumber(time));
     if (time.bits() > s_mostBitsOfNumber)
         refuse(std::string(name) + " has more than 1,000 digits");
+    if (!std::isfinite(time.nearest()))
+        refuse(std::string(name) + " is larger than the largest 64-bit floating-point number");
 }
 
 void requirePositive(const char* name, const Rational& number) {
@@ -111,6 +114,8 @@ void EditList::hold(const Rational& at, const Rational& duration) {
 
 void EditList::add(EditPiece piece) {
     const Rational duration = duration_ + piece.duration;
+    if (!std::isfinite(duration.nearest()))
+        refuse("the edited movie would last more seconds than the largest 64-bit floating-point number");
     const std::size_t bits = storedBits_ + (duration.bits() > s_freeBits ? 2 * duration.bits() : 0);
     if (duration.bits() > s_mostBits || bits > s_mostStoredBits)
         refuse("the pieces have too many different denominators; round their times and speeds, for example to "

@@ -71,8 +71,9 @@ struct EditListOptions {
 class ZULMETADATA_API EditList {
 public:
     /// Adds [start, end) at a speed. Throws `Error` and adds nothing if a time is negative, `end` is not after `start`,
-    /// or the speed is not above 0; also if a number has more than 1,000 digits, or the length of the edited movie
-    /// cannot be written with 65,536 binary digits above and below the line.
+    /// or the speed is not above 0; also if a number or the length of the edited movie is too large for a double, if a
+    /// number has more than 1,000 digits, or if the length cannot be written with 65,536 binary digits above and below
+    /// the line.
     void keep(const Rational& start, const Rational& end, const Rational& speed = 1);
 
     /// Adds "A-B" or "A-B@SPEED": a range as `parseEditRange` reads it, and a speed as `Rational::parse` does. Throws

@@ -148,14 +148,6 @@ std::optional<std::uint64_t> Natural::in64Bits() const {
     return high << s_digitBits | (isZero() ? 0 : digits_[0]);
 }
 
-std::size_t Natural::trailingZeros() const {
-    const auto lowest = std::find_if(digits_.begin(), digits_.end(), [](std::uint32_t digit) { return digit != 0; });
-    if (lowest == digits_.end())
-        return 0;
-    return static_cast<std::size_t>(lowest - digits_.begin()) * s_digitBits +
-           static_cast<std::size_t>(std::countr_zero(*lowest));
-}
-
 Natural Natural::shiftedLeft(std::size_t places) const {
     if (isZero())
         return {};

@@ -28,7 +28,6 @@ public:
     bool isOne() const { return digits_.size() == 1 && digits_[0] == 1; }
     std::size_t bits() const;                       ///< returns the position after the highest bit that is set
     std::optional<std::uint64_t> in64Bits() const;  ///< returns nothing for a number of more than 64 bits
-    std::size_t trailingZeros() const;              ///< returns the number of zero bits below the lowest bit
     Natural shiftedLeft(std::size_t places) const;  ///< returns it times two to the power of `places`
     Natural shiftedRight(std::size_t places) const; ///< returns it without its lowest bits
     std::string text() const;                       ///< returns its decimal digits

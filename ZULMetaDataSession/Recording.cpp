@@ -1,6 +1,7 @@
 #include "ZULMetaDataSession/Recording.h"
 
 #include "ZULMetaData/ZULMMetaDataWriter.h"
+#include "ZULMetaDataSession/OrError.h"
 #include "ZULMetaDataSession/RecordingStates.h"
 
 #include <algorithm>
@@ -12,23 +13,12 @@
 #include <new>
 #include <span>
 #include <stdexcept>
-#include <system_error>
 
 namespace ZULMetaData {
 
 namespace {
 
-/// Returns what `work` returns. A failure to read becomes an `Error`.
-template <class Work>
-auto orError(const std::string& name, Work work) {
-    try {
-        return work();
-    } catch (const FileError& error) {
-        throw Error(error.file(), error.sentence());
-    } catch (const std::system_error& error) {
-        throw Error(name, error.what());
-    }
-}
+using detail::orError;
 
 /// Returns the same bytes for any number of threads.
 ByteSource lockedSource(const ByteSource& bytes) {
@@ -182,6 +172,7 @@ Container::Type Recording::container() const {
 }
 
 std::optional<double> Recording::duration() const {
+    const std::lock_guard lock(state_->validation); // whose result has the duration too
     return orError(name(), [this] { return state_->file.duration(); });
 }
 
@@ -192,6 +183,11 @@ const std::vector<StreamInfo>& Recording::streams() const {
 std::vector<StreamReport> Recording::hiddenStreams() const {
     const std::lock_guard lock(state_->validation);
     return orError(name(), [this] { return state_->file.hiddenStreams(); });
+}
+
+bool Recording::hidesStreams() const {
+    const std::lock_guard lock(state_->validation);
+    return orError(name(), [this] { return state_->file.validation().hidesStreams(); });
 }
 
 std::vector<ZCAPHeader> Recording::creators() const {

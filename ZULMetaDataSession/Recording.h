@@ -60,6 +60,7 @@ public:
 
     const std::vector<StreamInfo>& streams() const;  ///< returns the streams that readers find
     std::vector<StreamReport> hiddenStreams() const; ///< returns the streams that the file holds and no reader finds
+    bool hidesStreams() const;                       ///< returns whether damage may keep readers from finding streams
     std::vector<ZCAPHeader> creators() const;        ///< returns who made the recording, the newest last
     bool has(const uuid& kind) const;                ///< returns whether readers find a stream of this kind
 

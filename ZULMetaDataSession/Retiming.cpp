@@ -12,7 +12,6 @@
 #include <memory>
 #include <optional>
 #include <span>
-#include <system_error>
 #include <utility>
 
 namespace ZULMetaData {
@@ -284,6 +283,8 @@ public:
             take(stream);
         for (const StreamReport& hidden : recording_.hiddenStreams())
             noteHidden(hidden);
+        if (result_.losses.empty() && recording_.hidesStreams())
+            lose("the metadata is damaged, so that streams may be missing");
         return std::move(result_);
     }
 
@@ -309,7 +310,7 @@ private:
 
     void retime(const StreamInfo& stream, const MetaDataHeader& header, const ByteSource& bytes) {
         EditedStream edited{stream, false, {}, ByteSource::memory({}), sunk_, 0};
-        EntryIndex index(bytes);
+        EntryIndex index(bytes, recording_.name());
         StreamOutput output(header, sink_);
         RecordedKinds::visit(header.uuid,
                              [&]<class Kind>() { retimeEntries<Kind>(index, output, clocks_, edited.counts); });
@@ -346,13 +347,7 @@ private:
 } // namespace
 
 EditedRecording retimed(const Recording& recording, const EditList& edits, const Sink& sink) {
-    try {
-        return Retimer(recording, edits, sink).run();
-    } catch (const FileError& error) {
-        throw Error(error.file(), error.sentence());
-    } catch (const std::system_error& error) {
-        throw Error(recording.name(), error.what());
-    }
+    return Retimer(recording, edits, sink).run();
 }
 
 EditedRecording retimed(const Recording& recording, const EditList& edits) {

@@ -3,7 +3,10 @@
 #include "Platform/LockFile.h"
 #include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
+#include "ZULMetaDataSession/OrError.h"
 
+#include <filesystem>
+#include <system_error>
 #include <utility>
 
 namespace ZULMetaData::detail {
@@ -67,7 +70,7 @@ void requireFree(const FileLocation& folder) {
                     "holds another session; record into another folder, or save that session and remove its files");
     for (const StreamFormat& format : streamFormats()) {
         const FileLocation file = format.fileIn(folder);
-        if (orSessionError(utf8Path(file), [&file] { return isThere(file); }))
+        if (orError(utf8Path(file), [&file] { return isThere(file); }))
             throw Error(utf8Path(file), "exists already; record into another folder");
     }
 }
@@ -76,7 +79,7 @@ std::vector<SessionStream> streamsIn(const FileLocation& folder) {
     std::vector<SessionStream> streams;
     for (const StreamFormat& format : streamFormats()) {
         const FileLocation file = format.fileIn(folder);
-        orSessionError(utf8Path(file), [&] {
+        orError(utf8Path(file), [&] {
             if (isThere(file))
                 streams.push_back(measured(file, format));
         });
@@ -95,7 +98,7 @@ std::vector<StreamSource> sourcesIn(const FileLocation& folder) {
 AttachResult saveFolder(const FileLocation& folder, const FileLocation& movie, const std::string& creatorName,
                         const std::string& creatorVersion, SafeMovieSave::FragmentIndex index) {
     const std::vector<StreamSource> sources = sourcesIn(folder);
-    return orSessionError(utf8Path(movie), [&] {
+    return orError(utf8Path(movie), [&] {
         const SafeMovieSave save(movie);
         if (!sources.empty())
             return save.attachAndStamp(AttachPlan(sources), creatorName, creatorVersion, index);
@@ -110,7 +113,7 @@ void removeSession(const FileLocation& folder) {
         files.push_back(format.fileIn(folder));
     files.push_back(lockFileIn(folder)); // last, so that a session that cannot be removed is still found
     for (const FileLocation& file : files)
-        orSessionError(utf8Path(file), [&file] { return std::filesystem::remove(file); });
+        orError(utf8Path(file), [&file] { return std::filesystem::remove(file); });
     std::error_code notEmpty;
     std::filesystem::remove(folder, notEmpty);
 }

@@ -4,19 +4,15 @@
 
 #include "Platform/FileLocation.h"
 #include "ZULMetaData/ZULMMetaDataUUIDs.h"
-#include "ZULMetaDataBridge/Source/FileError.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 #include "ZULMetaDataBridge/Source/StreamSource.h"
 #include "ZULMetaDataSession/AbandonedSession.h"
-#include "ZULMetaDataSession/Error.h"
 
 #include <array>
-#include <filesystem>
 #include <optional>
 #include <string>
 #include <string_view>
-#include <system_error>
 #include <vector>
 
 namespace ZULMetaData::detail {
@@ -52,21 +48,5 @@ AttachResult saveFolder(const FileLocation& folder, const FileLocation& movie, c
 
 /// Removes the files of the session, and the folder if nothing else is in it. Throws `Error`.
 void removeSession(const FileLocation& folder);
-
-/// Runs `work`. What it throws about files becomes an `Error` about `name`, unless it names a file itself.
-template <class Work>
-auto orSessionError(const std::string& name, Work work) {
-    try {
-        return work();
-    } catch (const SaveError& error) {
-        throw Error(error.file(), error.sentence());
-    } catch (const FileError& error) {
-        throw Error(error.file(), error.sentence());
-    } catch (const std::filesystem::filesystem_error& error) { // whose text repeats the names of files
-        throw Error(name, error.code().message());
-    } catch (const std::system_error& error) {
-        throw Error(name, error.what());
-    }
-}
 
 } // namespace ZULMetaData::detail

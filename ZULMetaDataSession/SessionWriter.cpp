@@ -5,6 +5,7 @@
 #include "Platform/LockFile.h"
 #include "Platform/NewFile.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
+#include "ZULMetaDataSession/OrError.h"
 #include "ZULMetaDataSession/SessionFolder.h"
 
 #include <algorithm>
@@ -121,7 +122,7 @@ SessionWriter::State::State(const FileLocation& sessionFolder, SessionOptions se
     if (!options.clock)
         flushAfter -= CoarseClock::resolution();
     flushAfter = std::max(flushAfter, std::chrono::nanoseconds(0));
-    const bool isNew = detail::orSessionError(utf8Path(folder), [this] { return createPrivateFolder(folder); });
+    const bool isNew = detail::orError(utf8Path(folder), [this] { return createPrivateFolder(folder); });
     try {
         own();
     } catch (const Error&) {
@@ -135,7 +136,7 @@ SessionWriter::State::State(const FileLocation& sessionFolder, SessionOptions se
 void SessionWriter::State::own() {
     detail::requireFree(folder);
     const FileLocation lockFile = detail::lockFileIn(folder);
-    detail::orSessionError(utf8Path(lockFile), [&] { lock.emplace(lockFile, s_lockNote); });
+    detail::orError(utf8Path(lockFile), [&] { lock.emplace(lockFile, s_lockNote); });
 }
 
 SessionWriter::State::~State() {
@@ -391,7 +392,7 @@ std::vector<StreamSource> SessionWriter::sources() const {
 
 std::vector<AbandonedSession> SessionWriter::abandoned(const FileLocation& folder) {
     std::vector<FileLocation> folders;
-    detail::orSessionError(utf8Path(folder), [&] {
+    detail::orError(utf8Path(folder), [&] {
         std::error_code unknown; // such a folder cannot be examined
         for (const auto& entry : std::filesystem::directory_iterator(folder))
             if (entry.is_directory(unknown))

@@ -167,14 +167,6 @@ private:
 
 namespace detail {
 
-/// Returns the place of a kind in a list of kinds.
-template <class Kind, class... Kinds>
-constexpr std::size_t placeIn(KindList<Kinds...>) {
-    std::size_t place = 0;
-    static_cast<void>(((std::is_same_v<Kind, Kinds> || (++place, false)) || ...));
-    return place;
-}
-
 /// Return what a session stores for a value.
 ///@{
 template <class Value>
@@ -205,7 +197,7 @@ inline std::list<std::string> storedValue(const ProcessInfo& machine) {
 
 template <RecordedKind Kind, SessionValue<Kind> Value>
 void SessionWriter::write(double seconds, const Value& value) {
-    constexpr std::size_t kind = detail::placeIn<Kind>(RecordedKinds());
+    constexpr std::size_t kind = detail::TracksOf<RecordedKinds>::placeOf<Kind>();
     if constexpr (Kind::role == StreamRole::Once)
         appendOnce(kind, detail::storedValue(value));
     else

@@ -58,7 +58,7 @@ struct ZULMETADATA_API Snapshot {
     Track<KeyboardActionKind>::Part keys;         ///< the keys up to now; the last one is the latest
     std::optional<Rect> window;                   ///< where the window on top is
     std::optional<std::string_view> title;        ///< of the window on top; may be invalid UTF-8
-    std::optional<std::string_view> application;  ///< in front; may be invalid UTF-8
+    std::optional<std::string_view> application;  ///< of that window; may be invalid UTF-8
     Slide slide;                                  ///< what is presented
     std::optional<Rect> hover;                    ///< what the cursor hovers over
     std::optional<Rect> region;                   ///< the last recorded region until now

@@ -5,6 +5,7 @@
 #include "AbandonedSession.h"
 #include "EditList.h"
 #include "Error.h"
+#include "Insights/Activity.h"
 #include "Insights/Camera.h"
 #include "Insights/Chapters.h"
 #include "Insights/Clicks.h"

@@ -1,4 +1,4 @@
-# What `cmake --install` puts in place, in the components Core, Bridge, Session, Tools and Viewer. What only a program's
+# What `cmake --install` puts in place, in the components Core, Bridge, Session, Tools, Viewer and Recorder. What only a program's
 # build needs of the libraries is in the components CoreDevelopment, BridgeDevelopment and SessionDevelopment.
 include(CMakePackageConfigHelpers)
 include(GNUInstallDirs)
@@ -55,6 +55,9 @@ endif()
 if(ZULMETADATA_BUILD_TOOLS)
   zulm_find_libraries_from(zulm ${CMAKE_INSTALL_FULL_BINDIR})
   install(EXPORT ZULMetaDataToolsTargets NAMESPACE ZULMetaData:: DESTINATION ${package_folder} COMPONENT Tools)
+endif()
+if(ZULMETADATA_RECORDER)
+  zulm_find_libraries_from(zulm-record ${CMAKE_INSTALL_FULL_BINDIR})
 endif()
 if(ZULMETADATA_BUILD_TOOLS AND ZULM_VIEWER)
   install(FILES ${PROJECT_BINARY_DIR}/Tools/viewer/viewer.html DESTINATION ${data_folder} COMPONENT Viewer)

@@ -24,7 +24,7 @@ table=$(mktemp)
 trap 'rm -f "$table"' EXIT
 missed=0
 printf '| task | beside | measured | target | |\n|---|---|---|---|---|\n' | tee "$table"
-for benchmark in Append Session Read Recording Scan Save List Image Load Insights; do
+for benchmark in Append Session Read Recording Scan Save List Image Load Insights Retiming; do
     "build/release/Benchmarks/${benchmark}Benchmark" "$task" | tee -a "$table" || missed=1
 done
 [ -z "$document" ] || python3 scripts/put_table.py Docs/performance.md <"$table"

@@ -45,7 +45,7 @@ stub() {
 
 install_compiler
 link_headers
-for library in libpng libtiff libre2 libutf8proc; do stub $library; done
+for library in libpng libtiff libz libre2 libutf8proc; do stub $library; done
 
 mapfile -t examples < <(basename -s .cpp Examples/*.cpp)
 for processor in aarch64 x86_64; do

@@ -14,9 +14,12 @@ record=(libx11-dev libxtst-dev libxcb1-dev libxcb-shm0-dev libxcb-xfixes0-dev li
     libpulse-dev libatspi2.0-dev)
 render=(libavcodec-dev libavfilter-dev libavformat-dev libavutil-dev libswresample-dev libswscale-dev libcairo2-dev
     libpango1.0-dev fonts-dejavu-core)
-desktop=(xvfb openbox xdotool xterm x11-utils x11-xserver-utils x11-xkb-utils xkb-data at-spi2-core dbus ffmpeg python3)
+desktop=(xvfb openbox xdotool xterm l3afpad x11-utils x11-xserver-utils x11-xkb-utils xkb-data at-spi2-core dbus ffmpeg python3)
+passwords=(python3-gi gir1.2-gtk-3.0)
+sound=(pulseaudio pulseaudio-utils)
 python=(python3-dev python3-numpy python3-pybind11 pybind11-dev python3-pip python3-setuptools python3-wheel python3-pytest
     python3-matplotlib mypy)
+many=(python3-pandas python3-dask python3-distributed) # for many recordings at once
 docs=(doxygen mkdocs python3-pygments)
 check=(clang clang-format git)
 lint=(clang clang-format clang-tidy cppcheck shellcheck codespell git python3)

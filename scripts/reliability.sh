@@ -5,7 +5,7 @@
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
-scripts/install.sh build media test check reliability record desktop browser
+scripts/install.sh build media test check reliability record desktop passwords sound browser
 echo "== building" >&2
 cmake --preset release -DZULMETADATA_BUILD_TESTS=ON -DZULM_BUILD_VIEWER=OFF >/dev/null
 cmake --build --preset release --target zulm reliability_programs >&2

@@ -7,8 +7,8 @@ cd "$(dirname "$0")/.."
 preset=${1:-dev}
 
 viewer=()
-scripts/install.sh build media test record render desktop
-[ "$preset" != dev ] || scripts/install.sh consumers python
+scripts/install.sh build media test record render desktop passwords sound
+[ "$preset" != dev ] || scripts/install.sh consumers python many
 case "$preset" in
     dev | release) scripts/install.sh viewer browser && viewer=(-DZULM_BUILD_VIEWER=ON) ;; # others leave it out
     clang) scripts/install.sh check ;;

@@ -5,7 +5,7 @@ zulm_project_options(zulmetadata)
 set(exported malloc free zulm_last_error zulm_close zulm_container zulm_duration zulm_stream_count zulm_stream
   zulm_hidden_count zulm_hidden zulm_read_entries zulm_read_hidden zulm_states zulm_insight
   zulm_retime zulm_free_entries zulm_entry_count zulm_entry_times zulm_column_count zulm_column
-  zulm_info zulm_verify zulm_dump zulm_text_bytes zulm_text_size zulm_free_text)
+  zulm_warning_count zulm_warning zulm_info zulm_verify zulm_dump zulm_text_bytes zulm_text_size zulm_free_text)
 list(TRANSFORM exported PREPEND "_")
 list(JOIN exported "," exported)
 set_target_properties(zulmetadata PROPERTIES SUFFIX .wasm)

@@ -84,8 +84,8 @@ export interface ByteSource {
 /** An open recording. It reads what it is asked for, and keeps nothing of the file but a few blocks. */
 export class Recording {
   /**
-   * Opens a movie (mp4, mov), a RIFF file (avi, wav) or a stream file. The extension of the name decides which; if it
-   * is not known, the first bytes do. Rejects with a `ZulmError` for anything else.
+   * Opens a movie (mp4, mov), a RIFF file (avi, wav) or a stream file. The first bytes decide which; the extension of
+   * the name counts only if they say nothing. Rejects with a `ZulmError` for anything else.
    *
    * A worker reads a `Blob` in slices, so it can be of any size; elsewhere a `Blob` is loaded as a whole. A `ByteSource`
    * is always read in slices. In Node, `openFile` of `zulmetadata/node` reads a file in slices.
@@ -106,6 +106,12 @@ export class Recording {
    */
   readonly hidden: StreamSummary[];
 
+  /**
+   * Called with a sentence if a file is damaged so that states, insights or retimed streams lack something. What it
+   * throws passes through.
+   */
+  onWarning?: (sentence: string) => void;
+
   /** Returns the entries of the stream of this kind or identifier. Throws a `ZulmError` if there is none. */
   entries(kind: string): Entries;
   /** Returns the entries of a hidden stream, by its index in `hidden`. */
@@ -113,28 +119,34 @@ export class Recording {
   /** Returns the entries of a kind with a finite time, in the order of their times. */
   track(kind: string): Entries;
   /**
-   * Returns what holds at each of these times, in seconds. The columns are those of `zulm_states` in `zulmetadata_c.h`.
-   * With "linear", the default, the cursor moves between
-   * two entries, but rests while nothing was recorded; with "none" it is where the last entry says.
+   * Returns what holds at one time or at each of several, in seconds. The columns are "x" and "y" of the cursor,
+   * "cursor_id", "hotspot_x", "hotspot_y" and "picture" of what it looks like, "opacity", "buttons" and "modifiers"
+   * (names with "+" between two, such as "shift+ctrl"), "window_x" to "window_height", "title", "application",
+   * "slide_title", "slide_text", "slide_comment", "hover_x" to "hover_height", "region_x" to "region_height", "scale" and
+   * "cpu". With "linear", the default, the cursor moves between two entries, but rests while nothing was recorded; with
+   * "none" it is where the last entry says.
    */
-  at(times: Iterable<number>, options?: { interpolate?: 'linear' | 'none' }): Table;
+  at(times: number | Iterable<number>, options?: { interpolate?: 'linear' | 'none' }): Table;
   /**
    * Returns what follows from the recording. `parameters` change the defaults that Docs/insights.md lists, by their
-   * names in lower case with underscores, such as `{ least: 3 }`. The columns are described in `zulmetadata_c.h`.
+   * names in lower case with underscores, such as `{ least: 3 }`. Docs/insights.md lists the columns, too.
    *
    * Captions have one row for each key: `label`, its text; `is_typed`, 1 for a character without modifiers, which makes
    * words with its neighbours; `first`, the row that begins its caption; `end`, until when its caption is shown. Unless
    * `shows_keys` is true, a bullet takes the place of what was typed.
    */
   insights(
-    name: 'clicks' | 'captions' | 'idle' | 'chapters' | 'zooms' | 'cursor_path' | 'camera',
+    name: 'clicks' | 'captions' | 'idle' | 'chapters' | 'zooms' | 'cursor_path' | 'camera' | 'activity' | 'applications',
     parameters?: Record<string, number | boolean>,
   ): Table;
   /**
-   * Returns the streams for a movie that was cut by an edit list: the JSON document, or the object that it describes.
-   * Throws a `ZulmError` for a list that cannot be.
+   * Returns the streams for a movie that was cut by an edit list: the text of a list, or the object that a JSON
+   * document describes. Lists of other programs are read, too. Throws a `ZulmError` for a list that cannot be.
+   *
+   * @param options `name` is the file of the list; its extension says the form if the text does not. `frameRate`, such
+   * as 25 or "30000/1001", is for lists that count frames.
    */
-  retime(edits: string | object): RetimedStream[];
+  retime(edits: string | object, options?: { name?: string; frameRate?: number | string }): RetimedStream[];
   /** Returns the file's object of `zulm info --json`. */
   info(): object;
   /** Returns the file's object of `zulm verify --json`, in which images are known by the size that they state. */

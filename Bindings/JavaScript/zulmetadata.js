@@ -99,7 +99,7 @@ class Core {
     return this.exports.memory.buffer;
   }
 
-  /** A function that gives a pointer, or null and a message. */
+  /** Calls a function that returns a pointer, or null and a message. */
   call(name, ...values) {
     this.readError = undefined;
     const result = this.exports[name](...values) >>> 0;
@@ -148,7 +148,7 @@ class Core {
     return new Numbers(this.memory, place, count).slice();
   }
 
-  /** All that `name` gives, of which there are as many as `name` with `_count` says. */
+  /** Returns all streams that `name` returns by their numbers; `name` with `_count` says how many there are. */
   streamsOf(recording, name) {
     const count = this.exports[`${name}_count`](recording) >>> 0;
     return Array.from({ length: count }, (_, index) => this.streamAt(this.exports[name](recording, index) >>> 0));
@@ -183,6 +183,14 @@ class Core {
     const time = this.copied(Float64Array, exports.zulm_entry_times(entries) >>> 0, count);
     exports.zulm_free_entries(entries);
     return { kind, time, columns: Object.fromEntries(columns) };
+  }
+
+  /** Entries that were computed, and in `warnings` what is missing among them. */
+  takeTable(entries, kind) {
+    this.warnings = Array.from({ length: this.exports.zulm_warning_count(entries) >>> 0 }, (_, index) =>
+      this.textAt(this.exports.zulm_warning(entries, index)),
+    );
+    return this.takeEntries(entries, kind);
   }
 
   columnAt(place, count) {
@@ -223,6 +231,7 @@ export class Recording {
   #handle;
   #name;
   #reader;
+  onWarning;
 
   static async open(source, name = source?.name || 'recording') {
     const reader = await readerOf(source);
@@ -265,11 +274,12 @@ export class Recording {
   }
 
   track(kind) {
-    const { time, columns } = this.entries(kind);
+    const entries = this.entries(kind);
+    const { time, columns } = entries;
+    if (time.every((value, row) => Number.isFinite(value) && !(value < time[row - 1]))) return entries;
     const rows = Uint32Array.from(time.keys()).filter((row) => Number.isFinite(time[row]));
     rows.sort((a, b) => time[a] - time[b] || a - b);
-    const ordered = (values) => Array.from(rows, (row) => values[row]);
-    const sorted = (values) => (Array.isArray(values) ? ordered(values) : values.constructor.from(ordered(values)));
+    const sorted = (values) => values.constructor.from(rows, (row) => values[row]);
     return {
       kind,
       time: sorted(time),
@@ -280,44 +290,48 @@ export class Recording {
   at(times, { interpolate = 'linear' } = {}) {
     if (interpolate !== 'linear' && interpolate !== 'none')
       throw new TypeError(`interpolate is 'linear' or 'none', not '${interpolate}'`);
-    return this.#guarded((core) => {
-      const numbers = Float64Array.from(times);
-      return core.withNumbers(numbers, (place) =>
-        core.takeEntries(
+    const numbers = Float64Array.from(typeof times === 'number' ? [times] : times);
+    return this.#computed((core) =>
+      core.withNumbers(numbers, (place) =>
+        core.takeTable(
           core.call('zulm_states', this.#handle, place, numbers.length, interpolate === 'linear' ? 1 : 0),
           'states',
-        ),
-      );
-    });
-  }
-
-  insights(name, parameters = {}) {
-    const list = Object.entries(parameters).map(([key, value]) => `${key}=${Number(value)}`);
-    return this.#guarded((core) =>
-      core.withText(name, (namePlace) =>
-        core.withText(list.join(), (listPlace) =>
-          core.takeEntries(core.call('zulm_insight', this.#handle, namePlace, listPlace), name),
         ),
       ),
     );
   }
 
-  retime(edits) {
+  insights(name, parameters = {}) {
+    const list = Object.entries(parameters).map(([key, value]) => `${key}=${Number(value)}`);
+    return this.#computed((core) =>
+      core.withText(name, (namePlace) =>
+        core.withText(list.join(), (listPlace) =>
+          core.takeTable(core.call('zulm_insight', this.#handle, namePlace, listPlace), name),
+        ),
+      ),
+    );
+  }
+
+  retime(edits, { name = 'edits', frameRate = '' } = {}) {
     const text = typeof edits === 'string' ? edits : JSON.stringify(edits);
-    return this.#guarded((core) => {
-      const { columns } = core.withText(text, (place) =>
-        core.takeEntries(core.call('zulm_retime', this.#handle, place), 'retimed'),
-      );
-      return columns.kind.map((kind, row) => ({
-        kind,
-        bytes: columns.bytes[row],
-        isCopied: columns.is_copied[row] === 1,
-        moved: columns.moved[row],
-        carried: columns.carried[row],
-        added: columns.added[row],
-        leftOut: columns.left_out[row],
-      }));
-    });
+    const { columns } = this.#computed((core) =>
+      core.withText(text, (textPlace) =>
+        core.withText(name, (namePlace) =>
+          core.withText(frameRate, (ratePlace) =>
+            core.takeTable(core.call('zulm_retime', this.#handle, textPlace, namePlace, ratePlace), 'retimed'),
+          ),
+        ),
+      ),
+    );
+    return columns.kind.map((kind, row) => ({
+      kind,
+      bytes: columns.bytes[row],
+      isCopied: columns.is_copied[row] === 1,
+      moved: columns.moved[row],
+      carried: columns.carried[row],
+      added: columns.added[row],
+      leftOut: columns.left_out[row],
+    }));
   }
 
   info() {
@@ -340,6 +354,13 @@ export class Recording {
     const reader = this.#reader;
     this.#reader = undefined;
     reader?.close?.();
+  }
+
+  /** Returns the table that `work` takes, and passes its warnings on. */
+  #computed(work) {
+    const table = this.#guarded(work);
+    for (const sentence of this.#core.warnings) this.onWarning?.(`${this.#name}: ${sentence}`);
+    return table;
   }
 
   /** Nothing but a `ZulmError` comes out; a core that broke is not used again. */

@@ -68,6 +68,7 @@ struct ZulmEntries {
     std::vector<double> times;
     std::vector<EntryColumn> columns;
     std::vector<ZulmColumn> views;
+    std::vector<std::string> warnings;
 };
 
 struct ZulmText {
@@ -188,6 +189,7 @@ std::vector<StreamReport> streamsNamed(const ZulmRecording& opened, const char* 
 ZulmEntries* entriesOf(Table table) {
     auto entries = std::make_unique<ZulmEntries>();
     entries->times = std::move(table.times);
+    entries->warnings = std::move(table.warnings);
     for (const TableColumn& column : table.columns)
         entries->columns.push_back(EntryColumn::of(column));
     for (const EntryColumn& column : entries->columns)
@@ -287,9 +289,10 @@ ZulmEntries* zulm_insight(ZulmRecording* recording, const char* name, const char
     return orNull([&] { return entriesOf(insightTable(recording->session(), name, parametersIn(parameters))); });
 }
 
-ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits) {
+ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits, const char* name, const char* frameRate) {
     return orNull([&] {
-        return entriesOf(retimedTable(recording->session(), EditList::read(edits, recording->recording.name())));
+        return entriesOf(
+            retimedTable(recording->session(), {edits, name ? name : "edits", frameRate ? frameRate : ""}));
     });
 }
 
@@ -311,6 +314,14 @@ size_t zulm_column_count(const ZulmEntries* entries) {
 
 const ZulmColumn* zulm_column(const ZulmEntries* entries, size_t index) {
     return &entries->views[index];
+}
+
+size_t zulm_warning_count(const ZulmEntries* entries) {
+    return entries->warnings.size();
+}
+
+const char* zulm_warning(const ZulmEntries* entries, size_t index) {
+    return entries->warnings[index].c_str();
 }
 
 ZulmText* zulm_info(ZulmRecording* recording) {

@@ -104,16 +104,20 @@ ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index);
    is where the last entry says; otherwise it moves between two entries, but rests while nothing was recorded. */
 ZulmEntries* zulm_states(ZulmRecording* recording, const double* times, size_t count, int32_t interpolates);
 
-/* Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path" or
-   "camera". `parameters` is null or a list such as "least=3". The captions have one row for each key: "label" is its
-   text, with a bullet in place of what was typed unless "shows_keys=1"; "is_typed" is 1 if it makes words with its
-   neighbours; "first" is the row that begins its caption, and "end" the time until which the caption is shown. */
+/* Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path", "camera",
+   "activity" or "applications". `parameters` is null or a list such as "least=3". The captions have one row for each
+   key: "label" is its text, with a bullet in place of what was typed unless "shows_keys=1"; "is_typed" is 1 if it makes
+   words with its neighbours; "first" is the row that begins its caption, and "end" the time until which the caption is
+   shown. The activity is one row for the span from "start" up to "end", and the applications are those that were on top
+   in it. */
 ZulmEntries* zulm_insight(ZulmRecording* recording, const char* name, const char* parameters);
 
-/* Returns the streams for a movie that was cut by an edit list, which is a JSON document: one row for each, with "kind"
-   and all its "bytes". "is_copied" is 1 if the bytes are those of the recording; otherwise "moved", "carried", "added"
-   and "left_out" count its entries. */
-ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits);
+/* Returns the streams for a movie that was cut by an edit list: one row for each, with "kind" and all its "bytes".
+   "is_copied" is 1 if the bytes are those of the recording; otherwise "moved", "carried", "added" and "left_out" count
+   its entries. `edits` is the text of a list in any form that the library reads. `name` is null or the file that it
+   comes from: its extension says the form if the text does not. `frameRate` is null or such as "30000/1001", for lists
+   that count frames. */
+ZulmEntries* zulm_retime(ZulmRecording* recording, const char* edits, const char* name, const char* frameRate);
 
 void zulm_free_entries(ZulmEntries* entries);
 
@@ -121,6 +125,10 @@ size_t zulm_entry_count(const ZulmEntries* entries);
 const double* zulm_entry_times(const ZulmEntries* entries); /* seconds */
 size_t zulm_column_count(const ZulmEntries* entries);
 const ZulmColumn* zulm_column(const ZulmEntries* entries, size_t index);
+
+/* Return sentences about what is missing in states, insights and retimed streams because of the file. */
+size_t zulm_warning_count(const ZulmEntries* entries);
+const char* zulm_warning(const ZulmEntries* entries, size_t index);
 
 /* What the tool prints as JSON: the file's object of `zulm info` and of `zulm verify`, and all that `zulm dump` prints.
    `kinds` is a list separated by commas, or null for every stream. */

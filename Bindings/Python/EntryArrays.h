@@ -21,12 +21,13 @@ const MetaDataKind& kindNamed(const std::string& name);
 /// numbers lies in memory as its entry does in the stream.
 py::dtype typeOfEntries(const std::string& kind);
 
-/// Of its fields the coordinates: numbers of which the library's writers for applications cut fractions off.
+/// Returns the names of its fields that are coordinates: the library's writers for applications cut off their
+/// fractions.
 py::list coordinatesOf(const std::string& kind);
 
-/// Returns every whole entry that fits the kind. Numbers stay where they were read to, in memory that the array keeps.
-/// Texts are whole; bytes in them that are not UTF-8 become lone surrogates. Throws `ValueError` for a stream whose
-/// version is not known.
+/// Returns every whole entry that fits the kind. Numbers are not copied after they are read: the array keeps that
+/// memory. Texts are whole; bytes in them that are not UTF-8 become lone surrogates. Throws `ValueError` for a stream
+/// whose version is not known.
 py::array readEntries(const StreamSource& stream);
 
 } // namespace ZULMetaData::Python

@@ -27,6 +27,7 @@ namespace {
 /// Throws `OSError` for a file that cannot be opened or read, `ValueError` for one that can hold no metadata.
 RecordingFile openRecording(const FileLocation& file) {
     try {
+        const py::gil_scoped_release others;
         return RecordingFile(file);
     } catch (const FileError&) {
         throw;
@@ -54,6 +55,7 @@ struct RecordingSummary {
 
 RecordingSummary lookInto(const FileLocation& file) {
     const RecordingFile recording = openRecording(file);
+    const py::gil_scoped_release others;
     RecordingSummary found{containerName(recording.container()), recording.duration(), {}, {}};
     for (const ZCAPHeader& info : recording.creators())
         found.creators.push_back(info.creator);

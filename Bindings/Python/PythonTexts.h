@@ -13,7 +13,7 @@ namespace py = pybind11;
 /// A text of a file, with what follows a zero byte in it. Bytes that are not UTF-8 become lone surrogates.
 py::str pythonText(const std::string& bytes);
 
-/// A path, or a sentence with a path in it, as `os.fsdecode` gives it.
+/// Returns a path, or a sentence with a path in it, as `os.fsdecode` returns it.
 py::str pathText(const std::string& bytes);
 
 /// The bytes of a `str`, lone surrogates as `pythonText` makes them, or of `bytes`. Throws `TypeError` for anything

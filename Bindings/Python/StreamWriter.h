@@ -25,11 +25,11 @@ public:
     StreamWriter(const StreamWriter&) = delete;
     StreamWriter& operator=(const StreamWriter&) = delete;
 
-    /// A whole file. Where `entries` do not fit, as for `extend`, nothing has been created or emptied.
+    /// Writes a whole file. If `entries` do not fit, as for `extend`, nothing is created or emptied.
     static void writeFile(const FileLocation& file, const MetaDataKind& kind, const py::array& entries);
 
-    /// Entries as `typeOfEntries` has them. Throws `TypeError` or `ValueError` for values that do not fit; nothing of
-    /// `entries` has been written then. `OSError` where the disk takes no more, or the writer is closed.
+    /// Writes entries as `typeOfEntries` has them. Throws `TypeError` or `ValueError` for values that do not fit, and
+    /// writes nothing of `entries` then. Throws `OSError` if the disk is full, or if the writer is closed.
     void extend(const py::array& entries);
 
     void flush();

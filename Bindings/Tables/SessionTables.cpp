@@ -1,5 +1,6 @@
 #include "Bindings/Tables/SessionTables.h"
 
+#include "ZULMetaDataSession/EditList.h"
 #include "ZULMetaDataSession/Insights/Insights.h"
 #include "ZULMetaDataSession/Retiming.h"
 #include "ZULMetaDataSession/Snapshot.h"
@@ -31,12 +32,11 @@ Text namesIn(const std::optional<EnumSet<Enum>>& set, const std::array<Enum, cou
 }
 
 Text namesOf(const std::optional<MouseButtons>& buttons) {
-    return namesIn(buttons, std::array{MouseButton::Left, MouseButton::Right, MouseButton::Middle});
+    return namesIn(buttons, s_mouseButtons);
 }
 
 Text namesOf(const std::optional<Modifiers>& modifiers) {
-    return namesIn(modifiers, std::array{Modifier::CapsLock, Modifier::Shift, Modifier::Control, Modifier::Alt,
-                                         Modifier::Command, Modifier::Windows});
+    return namesIn(modifiers, s_modifiers);
 }
 
 Text textOf(const std::optional<std::string_view>& text) {
@@ -174,7 +174,7 @@ std::vector<Zoom> zoomsIn(const InsightSources& sources, const InsightOptions& o
 
 Table clickRows(const InsightSources& sources, const InsightOptions& options, double) {
     const std::vector<Click> clicks = clicksIn(sources, options);
-    Table table{startsOf(clicks), {}};
+    Table table{startsOf(clicks), {}, {}};
     table.add("end", clicks, [](const Click& click) { return click.end; });
     table.add("button", clicks, [](const Click& click) { return Text(nameOf(click.button)); });
     table.add("modifiers", clicks, [](const Click& click) { return namesOf(std::optional(click.modifiers)); });
@@ -215,7 +215,7 @@ Table captionRows(const InsightSources& sources, const InsightOptions& options, 
 Table idleRows(const InsightSources& sources, const InsightOptions& options, double) {
     const std::vector<IdleSpan> spans = idleSpansOf(sources.positions, sources.actions, sources.keys, sources.scrolling,
                                                     sources.duration, options.idle);
-    Table table{startsOf(spans), {}};
+    Table table{startsOf(spans), {}, {}};
     table.add("end", spans, [](const IdleSpan& span) { return span.end; });
     return table;
 }
@@ -223,7 +223,7 @@ Table idleRows(const InsightSources& sources, const InsightOptions& options, dou
 Table chapterRows(const InsightSources& sources, const InsightOptions& options, double) {
     const std::vector<Chapter> chapters =
         chaptersOf(sources.titles, sources.applications, sources.slides, sources.duration, options.chapters);
-    Table table{startsOf(chapters), {}};
+    Table table{startsOf(chapters), {}, {}};
     table.add("end", chapters, [](const Chapter& chapter) { return chapter.end; });
     table.add("title", chapters, [](const Chapter& chapter) { return Text(chapter.title); });
     table.add("application", chapters, [](const Chapter& chapter) { return Text(chapter.application); });
@@ -268,9 +268,10 @@ std::vector<double> timesAt(double rate, double duration) {
 
 Table pathRows(const InsightSources& sources, const InsightOptions& options, double rate) {
     const CursorPath path = pathIn(sources, options);
+    Table table;
+    table.times = timesAt(rate, sources.duration);
     if (path.empty())
-        return {};
-    Table table{timesAt(rate, sources.duration), {}};
+        table.times.clear();
     const auto placeAt = [&path](double time) { return path.at(time).value_or(ScreenPoint()); };
     table.add("x", table.times, [&](double time) { return placeAt(time).x; });
     table.add("y", table.times, [&](double time) { return placeAt(time).y; });
@@ -279,7 +280,7 @@ Table pathRows(const InsightSources& sources, const InsightOptions& options, dou
 
 Table cameraRows(const InsightSources& sources, const InsightOptions& options, double rate) {
     const Camera camera(zoomsIn(sources, options), pathIn(sources, options), sources.screen, options.camera);
-    Table table{timesAt(rate, sources.duration), {}};
+    Table table{timesAt(rate, sources.duration), {}, {}};
     std::vector<CameraView> views;
     views.reserve(table.times.size());
     for (const double time : table.times)
@@ -289,6 +290,31 @@ Table cameraRows(const InsightSources& sources, const InsightOptions& options, d
     table.add("y", views, [](const CameraView& view) { return view.area.y; });
     table.add("width", views, [](const CameraView& view) { return view.area.width; });
     table.add("height", views, [](const CameraView& view) { return view.area.height; });
+    return table;
+}
+
+/// One row.
+Table activityRows(const InsightSources& sources, const InsightOptions& options, double) {
+    const std::array rows{activityOf(sources, options)};
+    const auto count = [](std::size_t number) { return static_cast<double>(number); };
+    Table table{startsOf(rows), {}, {}};
+    table.add("end", rows, [](const Activity& activity) { return activity.end; });
+    table.add("clicks", rows, [&](const Activity& activity) { return count(activity.clicks); });
+    table.add("keys", rows, [&](const Activity& activity) { return count(activity.keys); });
+    table.add("scrolls", rows, [&](const Activity& activity) { return count(activity.scrolls); });
+    table.add("idle", rows, [](const Activity& activity) { return activity.idle; });
+    table.add("distance", rows, [](const Activity& activity) { return activity.distance; });
+    return table;
+}
+
+/// One row for each application.
+Table applicationRows(const InsightSources& sources, const InsightOptions& options, double) {
+    const std::vector<ApplicationTime> applications = activityOf(sources, options).applications;
+    Table table;
+    for (const ApplicationTime& application : applications)
+        table.times.push_back(application.first);
+    table.add("name", applications, [](const ApplicationTime& application) { return Text(application.name); });
+    table.add("duration", applications, [](const ApplicationTime& application) { return application.duration; });
     return table;
 }
 
@@ -337,6 +363,15 @@ const std::vector<InsightTable>& insightTables() {
           {"follows_cursor", setOption<&Options::camera, &CameraOptions::followsCursor>},
           {"dead_zone", setOption<&Options::camera, &CameraOptions::deadZone>}},
          cameraRows},
+        {"activity",
+         {{"start", setOption<&Options::activity, &ActivitySpan::start>},
+          {"end", setOption<&Options::activity, &ActivitySpan::end>},
+          {"least", setOption<&Options::idle, &IdleOptions::least>}},
+         activityRows},
+        {"applications",
+         {{"start", setOption<&Options::activity, &ActivitySpan::start>},
+          {"end", setOption<&Options::activity, &ActivitySpan::end>}},
+         applicationRows},
     };
     return tables;
 }
@@ -364,15 +399,34 @@ Blob bytesOf(const EditedStream& stream) {
     return bytes;
 }
 
+/// Returns a function that notes what cannot be read.
+auto warningOf(std::vector<std::string>& warnings) {
+    return [&warnings](const Error& error) { warnings.push_back(error.sentence()); };
+}
+
+EditList listIn(const EditText& edits, const Recording& recording) {
+    EditListOptions options;
+    if (const std::optional<double> duration = recording.duration())
+        options.duration = Rational::of(*duration);
+    if (!edits.frameRate.empty()) {
+        options.frameRate = Rational::parse(edits.frameRate);
+        if (!options.frameRate || options.frameRate->isZero())
+            throw std::invalid_argument(edits.frameRate + " is no frame rate such as 25, 29.97 or 30000/1001");
+    }
+    return EditList::open(ByteSource::memory(edits.text), edits.name, options);
+}
+
 } // namespace
 
 Table statesTable(const Recording& recording, std::span<const double> times, Interpolation interpolation) {
-    Timeline timeline(
-        recording, [](const Error&) {}, interpolation);
+    Table table;
+    table.times.assign(times.begin(), times.end());
+    Timeline timeline(recording, warningOf(table.warnings), interpolation);
     StateRows rows;
     for (const double time : times)
         rows.add(timeline.at(time));
-    return {{times.begin(), times.end()}, rows.take()};
+    table.columns = rows.take();
+    return table;
 }
 
 std::vector<const char*> insightNames() {
@@ -388,16 +442,22 @@ Table insightTable(const Recording& recording, std::string_view name, const Insi
         if (name == table.name) {
             InsightOptions options;
             const double rate = applyParameters(table, parameters, options);
-            return table.rows(insightSourcesOf(recording, [](const Error&) {}), options, rate);
+            std::vector<std::string> warnings;
+            Table rows = table.rows(insightSourcesOf(recording, warningOf(warnings)), options, rate);
+            rows.warnings = std::move(warnings);
+            return rows;
         }
     throw std::invalid_argument("there are no insights " + std::string(name));
 }
 
-Table retimedTable(const Recording& recording, const EditList& edits) {
-    const EditedRecording edited = retimed(recording, edits);
+Table retimedTable(const Recording& recording, const EditText& edits) {
+    EditedRecording edited = retimed(recording, listIn(edits, recording));
     const std::vector<EditedStream>& streams = edited.streams;
     const auto count = [](std::uint64_t number) { return static_cast<double>(number); };
-    Table table{std::vector<double>(streams.size()), {}};
+    Table table;
+    table.times.resize(streams.size());
+    table.warnings = std::move(edited.warnings);
+    table.warnings.insert(table.warnings.end(), edited.losses.begin(), edited.losses.end());
     table.add("kind", streams, [](const EditedStream& stream) { return Text(stream.source.name()); });
     table.add("bytes", streams, bytesOf);
     table.add("is_copied", streams, [](const EditedStream& stream) { return std::int32_t{stream.isCopied}; });

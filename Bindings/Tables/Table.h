@@ -30,6 +30,7 @@ struct TableColumn {
 struct Table {
     std::vector<double> times; ///< in seconds
     std::vector<TableColumn> columns;
+    std::vector<std::string> warnings; ///< sentences about what is missing because of the file
 
     /// Adds the column of `valueOf(row)`.
     template <class Rows, class ValueOf>

@@ -235,11 +235,60 @@ TEST_F(CInterface, SaysWhatItCannotDo) {
     EXPECT_STREQ(zulm_last_error(), "there are no insights moods");
     EXPECT_FALSE(zulm_insight(recording.get(), "idle", "least"));
     EXPECT_STREQ(zulm_last_error(), "the parameters are not a list such as least=3,flicker=1");
-    EXPECT_FALSE(zulm_retime(recording.get(), "{}"));
-    EXPECT_THAT(zulm_last_error(), HasSubstr("Odd.mp4: "));
+    EXPECT_FALSE(zulm_retime(recording.get(), R"({"schema": 1})", nullptr, nullptr));
+    EXPECT_STREQ(zulm_last_error(), "edits: \"schema\" is not \"zulm.edits\"");
     EXPECT_FALSE(zulm_read_entries(recording.get(), zulm_stream(recording.get(), 0)->uuid));
     EXPECT_THAT(zulm_last_error(), HasSubstr("cannot be decoded"));
     EXPECT_TRUE(std::isnan(zulm_stream(recording.get(), 0)->first) || zulm_stream(recording.get(), 0)->isKnown == 0);
+}
+
+TEST_F(CInterface, WarnsOfWhatIsMissing) {
+    const std::string times = streamHeader("2b7b6af2", 1, 16) + pointEntry(NAN, 1, 2) + pointEntry(1, 3, 4);
+    const std::string apps = streamHeader("2b7b6a06", 1, 8) + textEntry(1, "Editor");
+    source_.bytes = movieWith(extendedAtom("DATA", times) + extendedAtom("DATA", apps));
+    const OpenRecording recording = opened(source_, "Odd.mp4");
+    ASSERT_TRUE(recording) << zulm_last_error();
+    const ReadEntries retimed(zulm_retime(
+        recording.get(), R"({"schema": "zulm.edits", "schema_version": 1, "pieces": []})", nullptr, nullptr));
+    ASSERT_TRUE(retimed) << zulm_last_error();
+    ASSERT_EQ(zulm_warning_count(retimed.get()), 2U);
+    EXPECT_THAT(zulm_warning(retimed.get(), 0), HasSubstr("topmostAppName"));
+    EXPECT_THAT(zulm_warning(retimed.get(), 1), HasSubstr("cursorLocation"));
+    constexpr double time = 2;
+    const ReadEntries states(zulm_states(recording.get(), &time, 1, 1));
+    ASSERT_TRUE(states) << zulm_last_error();
+    ASSERT_EQ(zulm_warning_count(states.get()), 1U);
+    EXPECT_STREQ(zulm_warning(states.get(), 0),
+                 "the stream topmostAppName states entries of 8 bytes instead of varying size; its header is damaged");
+}
+
+TEST_F(CInterface, ReadsEditListsOfOtherPrograms) {
+    const OpenRecording recording = open();
+    const auto movedPositions = [&](const char* edits, const char* name, const char* frameRate) {
+        const ReadEntries retimed(zulm_retime(recording.get(), edits, name, frameRate));
+        if (!retimed)
+            return std::string(zulm_last_error());
+        for (std::size_t row = 0; row < zulm_entry_count(retimed.get()); ++row)
+            if (textOf(retimed.get(), 0, row) == "cursorLocation")
+                return std::to_string(valuesOf<double>(retimed.get(), 3).at(row));
+        return std::string("no positions");
+    };
+    EXPECT_EQ(movedPositions("19,\n", "cuts.csv", nullptr), "60.000000"); // until the end of the recording
+    const char* decisions = "001  AX V C 00:00:01:00 00:00:02:00 00:00:00:00 00:00:01:00\n";
+    EXPECT_EQ(movedPositions(decisions, "a.edl", "25"), "60.000000");
+    EXPECT_EQ(movedPositions(decisions, "a.edl", nullptr),
+              "a.edl: an edit decision list counts frames; name its frame rate");
+    EXPECT_EQ(movedPositions(decisions, "a.edl", "fast"), "fast is no frame rate such as 25, 29.97 or 30000/1001");
+}
+
+TEST_F(CInterface, HasAllColumnsOfWhatHasNoRows) {
+    source_.bytes = streamHeader("2b7b6a06", 1, 0) + textEntry(1, "Editor");
+    const OpenRecording recording = opened(source_, "a.dat");
+    ASSERT_TRUE(recording) << zulm_last_error();
+    const ReadEntries path(zulm_insight(recording.get(), "cursor_path", nullptr));
+    ASSERT_TRUE(path) << zulm_last_error();
+    EXPECT_EQ(zulm_entry_count(path.get()), 0U);
+    EXPECT_EQ(zulm_column_count(path.get()), 2U);
 }
 
 TEST_F(CInterface, SaysThatBytesCannotBeRead) {

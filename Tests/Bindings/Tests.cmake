@@ -29,7 +29,7 @@ if(ZULMETADATA_PYTHON)
   add_test(NAME Bindings/Python
     COMMAND ${CMAKE_COMMAND} -E env PYTHONPATH=${ZULMETADATA_PYTHON_PACKAGE} PYTHONDONTWRITEBYTECODE=1 ${session_numbers}
       ${Python_EXECUTABLE} -m pytest -q -p no:cacheprovider ${CMAKE_CURRENT_SOURCE_DIR}/Bindings/Python)
-  set_tests_properties(Bindings/Python PROPERTIES TIMEOUT 300)
+  set_tests_properties(Bindings/Python PROPERTIES TIMEOUT 900) # it starts a cluster of two workers
 endif()
 if(ZULMETADATA_PYTHON AND ZULMETADATA_TEST_CONSUMERS)
   add_test(NAME Consumers/wheel COMMAND ${CMAKE_COMMAND} -DPYTHON=${Python_EXECUTABLE}

@@ -74,7 +74,7 @@ int main(int count, char** arguments) {
     for (const char* name : insightNames())
         document["insights"][name] = jsonOf(insightTable(recording, name, {}));
     document["least_3"] = jsonOf(insightTable(recording, "idle", {{"least", 3}}));
-    document["retimed"] = jsonOf(retimedTable(recording, EditList::read(arguments[2], "edits")));
+    document["retimed"] = jsonOf(retimedTable(recording, {arguments[2]}));
     std::cout << document << '\n';
     return 0;
 }

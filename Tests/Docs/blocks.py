@@ -95,7 +95,7 @@ def make_recordings(folder, zulm):
     subprocess.run([zulm, "demo", "demo"], check=True, cwd=folder, stdout=subprocess.DEVNULL)
     recording = (folder / "demo" / "Recording.mp4").read_bytes()
     metadata = recording.index(b"ZULM") - 4
-    for name in ("Recording", "Original", "Edited"):
+    for name in ("Recording", "Original", "Edited", "Talk"):
         (folder / f"{name}.mp4").write_bytes(recording)
     for name in ("Movie", "Remuxed", "Copy", "Cut"):
         (folder / f"{name}.mp4").write_bytes(recording[:metadata])
@@ -121,7 +121,7 @@ def run_shell(block, folder, environment, has_viewer):
     printed = ""
     for command in shell_lines(block.code):
         script = command.split()[0]
-        if re.match(r"scripts/|cmake |ctest ", command) or re.search(r"\b(pip|venv)\b", command):  # other tests run these
+        if re.match(r"scripts/|cmake |ctest |zulm (record|cut) ", command) or re.search(r"\b(pip|venv)\b", command):  # other tests run these
             if script.startswith("scripts/") and not os.access(ROOT / script, os.X_OK):
                 return f"{script} is not a script", printed
             continue

@@ -1,5 +1,6 @@
 # What the checks of allocation failures run: one program for the library, and for the tool a library for LD_PRELOAD.
 zulm_add_reliability_program(allocation_failures allocation_failures.cpp FailingAllocations.cpp)
+target_link_libraries(allocation_failures PRIVATE ZULMetaData::Session)
 
 add_library(AllocationShim MODULE EXCLUDE_FROM_ALL
   Reliability/Programs/AllocationShim.cpp Reliability/Programs/FailingAllocations.cpp)

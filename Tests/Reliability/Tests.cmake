@@ -10,7 +10,7 @@ function(zulm_add_reliability_program name)
   add_dependencies(reliability_programs ${name})
 endfunction()
 if(ZULMETADATA_RECORDER)
-  add_dependencies(reliability_programs zulm-record ShownWindow) # screen_kills and screen_sync
+  add_dependencies(reliability_programs zulm-record ShownWindow) # the checks of the screen recorder
 endif()
 include(Reliability/FaultTests.cmake)
 include(Reliability/HostileTests.cmake)

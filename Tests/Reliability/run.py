@@ -21,6 +21,7 @@ CHECKS = {
     "screen_kills": "screen recorder killed at random moments, and on full disks",
     "screen_passwords": "passwords that the screen recorder must not have",
     "screen_sync": "picture of the screen recorder against its entries",
+    "screen_cost": "processor and memory that the screen recorder takes",
     "kill_system_calls": "attach, repair and stamp killed at every system call",
     "io_faults": "ENOSPC, EIO, EINTR and short transfers at every operation",
     "full_disk": "a real full disk at every fill level",
@@ -37,8 +38,9 @@ CHECKS = {
     "threads": "readers and writers on many threads",
     "mutation": "mutants of the stream core killed by the tests",
 }
-# Those of the screen measure times of pictures, which other checks beside them would change.
-FULL_ONLY = {"mutation", "screen_kills", "screen_passwords", "screen_sync"}
+FULL_ONLY = {"mutation"}
+# They measure times of pictures, which other checks beside them would change.
+ALONE = ["screen_kills", "screen_passwords", "screen_sync", "screen_cost"]
 MOST_SHOWN = 50  # failures of one check
 LONGEST = ["fuzzing", "mutation", "valgrind", "truncations", "bit_flips"]  # started first
 
@@ -73,6 +75,13 @@ def remember(arguments, rows):
     return earlier | rows
 
 
+def tell(name, result, seconds):
+    print(f"{name}: {'holds' if result.holds() else 'FAILS'} ({result.cases} cases, {seconds:.0f} s)", file=sys.stderr,
+          flush=True)
+    for line in result.notes + result.failures[:MOST_SHOWN]:
+        print(f"    {line}", file=sys.stderr)
+
+
 def document(text):
     subprocess.run([sys.executable, SOURCE / "scripts/put_table.py", SOURCE / "Docs/reliability.md"], input=text,
                    encoding="utf-8", check=True)
@@ -89,18 +98,15 @@ def main():
         parser.error("no check is called " + ", ".join(sorted(unknown)))
 
     names = arguments.only or [name for name in CHECKS if arguments.extent == "full" or name not in FULL_ONLY]
+    order = [name for name in LONGEST if name in names] + [name for name in names if name not in LONGEST]
     outcomes = {}
-    with concurrent.futures.ProcessPoolExecutor(max_workers=2) as pool:
-        order = [name for name in LONGEST if name in names] + [name for name in names if name not in LONGEST]
-        for done in concurrent.futures.as_completed([pool.submit(execute, name, arguments) for name in order]):
-            name, result, seconds = done.result()
-            outcomes[name] = (name, result, seconds)
-            print(f"{name}: {'holds' if result.holds() else 'FAILS'} ({result.cases} cases, {seconds:.0f} s)",
-                  file=sys.stderr, flush=True)
-            for note in result.notes:
-                print(f"    {note}", file=sys.stderr)
-            for failure in result.failures[:MOST_SHOWN]:
-                print(f"    {failure}", file=sys.stderr)
+    for workers, some in ((1, [name for name in ALONE if name in names]),
+                          (2, [name for name in order if name not in ALONE])):
+        with concurrent.futures.ProcessPoolExecutor(workers) as pool:
+            for done in concurrent.futures.as_completed([pool.submit(execute, name, arguments) for name in some]):
+                name, result, seconds = done.result()
+                outcomes[name] = (name, result, seconds)
+                tell(name, result, seconds)
 
     rows = {name: row(*outcome) for name, outcome in outcomes.items()}
     print(table(rows))

@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <filesystem>
 #include <string>
+#include <vector>
 
 namespace ZULMetaData::Test {
 
@@ -24,6 +25,9 @@ public:
 private:
     std::filesystem::path path_;
 };
+
+/// Returns the names of what is in a folder, sorted.
+std::vector<std::string> namesIn(const std::filesystem::path& folder);
 
 std::string contentsOf(const std::filesystem::path& file);
 void writeFile(const std::filesystem::path& file, const std::string& contents);

@@ -10,7 +10,6 @@
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
-#include <algorithm>
 #include <filesystem>
 #include <map>
 
@@ -42,14 +41,6 @@ protected:
     std::string stream(const std::string& name, const std::string& bytes) const {
         writeFile(folder / name, bytes);
         return folder / name;
-    }
-
-    std::vector<std::string> namesInFolder() const {
-        std::vector<std::string> names;
-        for (const auto& entry : std::filesystem::directory_iterator(folder.path()))
-            names.push_back(entry.path().filename());
-        std::sort(names.begin(), names.end());
-        return names;
     }
 
     /// A movie that players play.
@@ -383,7 +374,7 @@ TEST_F(AttachCommand, TrimsWhatLiesOutsideOfTheMovie) {
     EXPECT_EQ(file.at("streams").at(0).at("source"), old);
     EXPECT_EQ(contentsOf(out),
               tinyMovie(420, 600) + zulmAtom({appNameStream().substr(0, 24 + 15), locationStream().substr(0, 40)}));
-    EXPECT_EQ(namesInFolder(), (std::vector<std::string>{"Old.mp4", "Out.mp4", "Plain.mp4"}));
+    EXPECT_EQ(namesIn(folder.path()), (std::vector<std::string>{"Old.mp4", "Out.mp4", "Plain.mp4"}));
 }
 
 TEST_F(AttachCommand, LeavesOutStreamsOfWhichNothingIsInTheMovie) {
@@ -457,7 +448,7 @@ TEST_F(AttachCommand, RefusesMoviesThatAreNone) {
 TEST_F(AttachCommand, LeavesNoTraceOfAnAppendThatFails) {
     const std::string large = stream("large.dat", streamHeader(s_cursorLocations, 1, 16) + std::string(1 << 20, 'x'));
     const std::string open = stream("Open.mp4", be32(0) + "mdat" + "0123456789");
-    const auto names = namesInFolder();
+    const auto names = namesIn(folder.path());
     const std::string limited = "ulimit -f 100; exec \"$0\" \"$@\"";
     for (const std::vector<std::string>& destination : {std::vector<std::string>{"--in-place"}, {"-o", out}}) {
         std::vector<std::string> arguments{"-c", limited, ZULM_PATH, "attach", open, large};
@@ -466,7 +457,7 @@ TEST_F(AttachCommand, LeavesNoTraceOfAnAppendThatFails) {
         EXPECT_EQ(result.exitCode, 1) << result.errors;
         EXPECT_THAT(result.errors, HasSubstr("cannot be written at offset"));
         EXPECT_EQ(contentsOf(open), be32(0) + "mdat" + "0123456789");
-        EXPECT_EQ(namesInFolder(), names);
+        EXPECT_EQ(namesIn(folder.path()), names);
     }
 }
 

@@ -66,9 +66,9 @@ TEST_F(CommandLine, RefusesWrongArguments) {
     expectRefused({"info", "--no-progres", "a.mp4"}, "did you mean --no-progress?");
     expectRefused({"repair", "a.mp4", "b.mp4"}, "b.mp4 is one argument too many");
     expectRefused({"dump", "--format", "jsn", "a.mp4"},
-                  "--format: jsn is none of text, json, ndjson, csv; did you mean json?");
+                  "--format: jsn is not one of text, json, ndjson, csv; did you mean json?");
     expectRefused({"dump", "--from", "2", "--to", "1", "a.mp4"}, "--from: 2 is later than --to 1");
-    expectRefused({"info", "--color", "sometimes", "a.mp4"}, "--color: sometimes is none of auto, always, never");
+    expectRefused({"info", "--color", "sometimes", "a.mp4"}, "--color: sometimes is not one of auto, always, never");
     expectRefused({"info", "-q", "-v", "a.mp4"}, "--quiet cannot be given together with --verbose");
     expectRefused({"repair", "--force", "--in-place", "a.mp4"}, "--force can only be given together with --output");
     expectRefused({"--json", "info", "a.mp4"}, "--json is an option of 'zulm info': it follows info");

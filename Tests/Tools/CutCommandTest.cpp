@@ -209,13 +209,6 @@ protected:
                                   " -show_entries stream=duration -of csv=p=0 '" + out + "'"));
     }
 
-    std::vector<std::string> namesInFolder() const {
-        std::vector<std::string> names;
-        for (const auto& entry : std::filesystem::directory_iterator(folder.path()))
-            names.push_back(entry.path().filename());
-        return names;
-    }
-
     TemporaryFolder folder;
     const std::string out = folder / "Out.mp4";
 
@@ -252,7 +245,7 @@ TEST_F(CutCommand, KeepsTheMarkerUnderTheCursor) {
     expectFramesAt({0, 1.51, 3.49});
     EXPECT_NEAR(lengthOf("v:0"), 4.29, 0.0005);
     EXPECT_NEAR(lengthOf("a:0"), 4.29, 0.03);
-    EXPECT_THAT(namesInFolder(), ElementsAre("Out.mp4"));
+    EXPECT_THAT(namesIn(folder.path()), ElementsAre("Out.mp4"));
 }
 
 TEST_F(CutCommand, KeepsItAtOtherSpeedsAndInHeldFrames) {
@@ -293,6 +286,25 @@ TEST_F(CutCommand, CutsMoviesWithoutSound) {
     expectMarkerUnderCursor();
     EXPECT_NEAR(lengthOf("v:0"), 3.75, 0.0005);
     EXPECT_EQ(outputOf("ffprobe -v error -select_streams a -show_entries stream=index -of csv=p=0 " + out), "");
+}
+
+TEST_F(CutCommand, CutsMoviesOfOneFrame) {
+    const std::string still = folder / "still.mp4";
+    outputOf("ffmpeg -v error -f lavfi -i color=white:s=64x48:r=1/20 -frames:v 1 -c:v libx264 " + still);
+    writeFile(still, contentsOf(still) + zulmAtom({locationStream()}));
+    const std::vector<std::pair<std::vector<std::string>, double>> lengths{
+        {{"--keep", "0-4"}, 4},
+        {{"--keep", "5-9", "--keep", "1-2"}, 5},
+        {{"--keep", "1-4@2", "--keep", "2-19", "--keep", "0-1@1/2"}, 20.5}};
+    for (const auto& [edits, length] : lengths) {
+        std::vector<std::string> arguments = edits;
+        arguments.push_back("--force");
+        const ToolResult result = cut(still, arguments);
+        EXPECT_EQ(result.errors, "");
+        EXPECT_NEAR(lengthOf("v:0"), length, 0.0005);
+        EXPECT_NEAR(std::stod(outputOf("ffprobe -v error -show_entries format=duration -of csv=p=0 " + out)), length,
+                    0.0005);
+    }
 }
 
 TEST_F(CutCommand, KeepsTurnedMoviesTurned) {
@@ -390,7 +402,7 @@ TEST_F(CutCommand, RefusesSpeedsAndHeldFramesInAFastCut) {
     const ToolResult result = cut(movie("steady"), {"--fast", "--keep", "1-2@2"});
     EXPECT_EQ(result.exitCode, 1);
     EXPECT_THAT(result.errors, HasSubstr("--fast copies pictures"));
-    EXPECT_THAT(namesInFolder(), ElementsAre());
+    EXPECT_THAT(namesIn(folder.path()), ElementsAre());
 }
 
 // What goes wrong -------------------------------------------------------------------------------------------------
@@ -401,7 +413,7 @@ TEST_F(CutCommand, SaysWhatIsMissing) {
     const ToolResult result = runTool({"cut", movie("steady"), "--keep", "1-2", "-o", out}, options);
     EXPECT_EQ(result.exitCode, 1);
     EXPECT_THAT(result.errors, HasSubstr("ffmpeg: no such program in PATH; install ffmpeg"));
-    EXPECT_THAT(namesInFolder(), ElementsAre());
+    EXPECT_THAT(namesIn(folder.path()), ElementsAre());
 }
 
 TEST_F(CutCommand, WritesNothingIfFFmpegFails) {
@@ -409,7 +421,7 @@ TEST_F(CutCommand, WritesNothingIfFFmpegFails) {
     writeFile(broken, tinyMovie() + zulmAtom({locationStream()}));
     const ToolResult result = cut(broken, {"--keep", "1-2"});
     EXPECT_EQ(result.exitCode, 1);
-    EXPECT_THAT(namesInFolder(), ElementsAre("Broken.mp4"));
+    EXPECT_THAT(namesIn(folder.path()), ElementsAre("Broken.mp4"));
 }
 
 TEST_F(CutCommand, EndsAsRetimeDoes) {
@@ -442,7 +454,7 @@ TEST_F(CutCommand, LeavesNothingWhenItIsInterrupted) {
             runTool({"cut", movie("steady"), "--keep", "0-8@1/40", "--keep", "0-7", "-o", out}, options);
         EXPECT_EQ(result.exitCode, 128 + signal);
         EXPECT_THAT(result.errors, HasSubstr("interrupted; nothing was written"));
-        EXPECT_THAT(namesInFolder(), ElementsAre());
+        EXPECT_THAT(namesIn(folder.path()), ElementsAre());
         for (const auto& process : std::filesystem::directory_iterator("/proc")) {
             std::ifstream commandLine(process.path() / "cmdline");
             const std::string words{std::istreambuf_iterator<char>(commandLine), {}};

@@ -40,7 +40,7 @@ std::vector<std::string> commands() {
 /// The long options of a command, by what its help lists.
 std::vector<std::string> optionsOf(const std::string& command) {
     std::vector<std::string> names;
-    const std::string page = runTool({command, "--help"}).output;
+    const std::string page = runTool({"help", command}).output; // the recorder's too, which may not be there
     const std::regex option("\n  (?:-[a-zA-Z], )?(--[a-z-]+)");
     for (auto match = std::sregex_iterator(page.begin(), page.end(), option); match != std::sregex_iterator(); ++match)
         names.push_back((*match)[1]);
@@ -84,8 +84,8 @@ TEST(Manual, NamesEveryOptionOfEveryCommandInEveryForm) {
     const std::string zsh = generated("zsh");
     const std::string fish = generated("fish");
     for (const std::string& command : commands()) {
-        if (command == "record" || command == "render" || command == "guide")
-            continue; // their options are those of programs of their own, which may not be there
+        if (command == "render" || command == "guide")
+            continue; // their options are those of a program of its own, which may not be there
         EXPECT_THAT(man, HasSubstr(".SS " + command + "\n"));
         EXPECT_THAT(markdown, HasSubstr("\n### " + command + "\n"));
         EXPECT_THAT(zsh, HasSubstr("\n        " + command + ") _arguments"));
@@ -109,6 +109,17 @@ TEST(Manual, IsAPageThatGroffReadsWithoutAWarning) {
     EXPECT_EQ(result.exitCode, 0);
     EXPECT_EQ(result.errors, "");
     EXPECT_THAT(result.output, HasSubstr("Signal n ended the command"));
+}
+
+TEST(Manual, HasAPageOfTheRecorder) {
+    TemporaryFolder folder;
+    const std::string page = generated("man-record");
+    for (const std::string& option : optionsOf("record"))
+        EXPECT_THAT(std::regex_replace(page, std::regex("\\\\-"), "-"), HasSubstr("\\fB" + option + "\\fR"));
+    writeFile(folder / "zulm-record.1", page);
+    const ToolResult result = runProgram("groff", {"-man", "-Tutf8", "-ww", folder / "zulm-record.1"});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_EQ(result.errors, "");
 }
 
 TEST(Manual, IsTheCommittedPage) {

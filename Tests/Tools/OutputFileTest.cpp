@@ -51,13 +51,6 @@ protected:
         EXPECT_EQ(result.exitCode, 0) << testing::PrintToString(arguments) << result.errors;
     }
 
-    std::vector<std::string> namesInFolder() const {
-        std::vector<std::string> names;
-        for (const auto& entry : fs::directory_iterator(folder.path()))
-            names.push_back(entry.path().filename());
-        return names;
-    }
-
     const mode_t oldMask = umask(022);
     const TemporaryFolder folder;
     const std::string out = folder / "Out.mp4";
@@ -150,7 +143,7 @@ TEST_F(OutputFileTest, IsWrittenByOneOfTwoCommandsAtOnce) {
     }
     EXPECT_EQ(results[0].exitCode + results[1].exitCode, 1) << results[0].errors << results[1].errors;
     EXPECT_EQ(contentsOf(out), contentsOf(whole));
-    EXPECT_EQ(namesInFolder().size(), 2U);
+    EXPECT_EQ(namesIn(folder.path()).size(), 2U);
 }
 
 TEST_F(OutputFileTest, MayHaveTheLongestNameThereIs) {

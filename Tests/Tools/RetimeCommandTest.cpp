@@ -56,14 +56,6 @@ protected:
         return runTool(arguments);
     }
 
-    std::vector<std::string> namesInFolder() const {
-        std::vector<std::string> names;
-        for (const auto& entry : std::filesystem::directory_iterator(folder.path()))
-            names.push_back(entry.path().filename());
-        std::sort(names.begin(), names.end());
-        return names;
-    }
-
     TemporaryFolder folder;
     const std::string recording = folder / "Recording.mp4";
     const std::string edited = folder / "Edited.mp4";
@@ -81,7 +73,7 @@ TEST_F(RetimeCommand, WritesACopyWithTheMetaDataAtItsNewTimes) {
     EXPECT_EQ(contentsOf(out), tinyMovie(6000) + zulmAtom({actions({{1, 1}, {2, 2}, {2, 1}, {2.5, 2}}),
                                                            points({{1, 1}, {2.5, 5}, {6, 12}}), region}));
     EXPECT_EQ(contentsOf(edited), tinyMovie(6000));
-    EXPECT_THAT(namesInFolder(), ElementsAre("Edited.mp4", "Out.mp4", "Recording.mp4"));
+    EXPECT_THAT(namesIn(folder.path()), ElementsAre("Edited.mp4", "Out.mp4", "Recording.mp4"));
 }
 
 TEST_F(RetimeCommand, KeepsThePiecesInTheOrderGiven) {
@@ -123,6 +115,7 @@ TEST_F(RetimeCommand, WantsToKnowWhatIsKept) {
     for (const std::string wrong : {"1", "1:2", "a-b", "1-2@", "1-2@fast", "1-2-3", "1e1-20", ""})
         EXPECT_EQ(retime({"--keep=" + wrong}).exitCode, 2) << wrong;
     EXPECT_EQ(retime({"--remove", "1-2@2"}).exitCode, 2);
+    EXPECT_EQ(retime({"--edits", "-"}, "-").exitCode, 2);
     EXPECT_EQ(runTool({"retime", recording, "--keep", "1-2", "-o", out}).exitCode, 2);
     EXPECT_EQ(runTool({"retime", recording, "--movie", edited, "--keep", "1-2"}).exitCode, 2);
     EXPECT_FALSE(std::filesystem::exists(out));
@@ -131,7 +124,10 @@ TEST_F(RetimeCommand, WantsToKnowWhatIsKept) {
 TEST_F(RetimeCommand, RefusesEditListsThatAreImpossible) {
     EXPECT_EQ(retime({"--keep", "2-1"}).exitCode, 1);
     EXPECT_EQ(retime({"--keep", "1-1"}).exitCode, 1);
+    EXPECT_EQ(retime({"--keep", "0-1", "--keep", "1-2@0"}).errors,
+              "zulm: --keep 1-2@0: speed is 0; it must be above 0\n");
     EXPECT_EQ(retime({"--keep", "1-2@0"}).exitCode, 1);
+    EXPECT_EQ(retime({"--remove", "2-1"}).errors, "zulm: --remove 2-1: end is 1, which is not after start, 2\n");
     EXPECT_EQ(retime({"--remove", "2-1"}).exitCode, 1);
     const std::string list =
         written("edits.json", R"({"schema": "zulm.edits", "schema_version": 1, "pieces": [{"at": 1}]})");
@@ -149,7 +145,7 @@ TEST_F(RetimeCommand, RefusesAnEditedMovieWithMetaDataUnlessItReplacesThat) {
     EXPECT_EQ(refused.exitCode, 1);
     EXPECT_THAT(refused.errors,
                 HasSubstr(edited + ": has metadata already: topmostAppName, cursorLocation; --replace"));
-    EXPECT_THAT(namesInFolder(), ElementsAre("Edited.mp4", "Recording.mp4"));
+    EXPECT_THAT(namesIn(folder.path()), ElementsAre("Edited.mp4", "Recording.mp4"));
     EXPECT_EQ(retime({"--keep", "0-10", "--replace"}).exitCode, 0);
     EXPECT_EQ(contentsOf(out),
               tinyMovie(6000) + creator + zulmAtom({actions({{1, 1}, {5, 2}}), points({{1, 1}, {5, 5}}), region}));
@@ -232,7 +228,7 @@ TEST_F(RetimeCommand, RefusesWhatIsNoMovie) {
     EXPECT_EQ(retime({"--keep", "0-10"}).exitCode, 1);
     writeFile(edited, "no movie at all");
     EXPECT_EQ(retime({"--keep", "0-10"}).exitCode, 1);
-    EXPECT_THAT(namesInFolder(), ElementsAre("Edited.mp4", "Recording.mp4"));
+    EXPECT_THAT(namesIn(folder.path()), ElementsAre("Edited.mp4", "Recording.mp4"));
 }
 
 TEST_F(RetimeCommand, ReplacesNoFileUnlessItIsForced) {

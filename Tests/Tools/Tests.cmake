@@ -31,6 +31,7 @@ zulm_add_tests(ToolsTests
   InsightsCommandTest
   JsonReportTest
   ManualTest
+  ManyFilesTest
   OutOfMemoryTest
   OutputFileTest
   RedactCommandTest

@@ -77,12 +77,28 @@ TEST(EditList, RefusesImpossiblePieces) {
 }
 
 TEST(EditList, RefusesNumbersThatItCouldNotReadBack) {
-    const Rational large = *Rational::parse('1' + std::string(999, '0'));
+    const Rational small = *Rational::parse("1/1" + std::string(999, '0'));
     EditList edits;
-    EXPECT_EQ(errorOf([&] { edits.keep(0, large * 10); }), "end has more than 1,000 digits");
-    EXPECT_EQ(errorOf([&] { edits.hold(Rational(1) / (large * 10), 1); }), "at has more than 1,000 digits");
+    EXPECT_EQ(errorOf([&] { edits.keep(0, small / 10); }), "end has more than 1,000 digits");
+    EXPECT_EQ(errorOf([&] { edits.hold(small / 10, 1); }), "at has more than 1,000 digits");
+    edits.keep(0, small);
+    EXPECT_EQ(EditList::read(edits.json(), "a.json").duration(), small);
+}
+
+TEST(EditList, RefusesTimesThatNoEntryCanHave) {
+    const Rational large = *Rational::parse('1' + std::string(308, '0'));
+    const std::string tooLarge = " is larger than the largest 64-bit floating-point number";
+    EditList edits;
+    EXPECT_EQ(errorOf([&] { edits.keep(0, large * 2); }), "end" + tooLarge);
+    EXPECT_EQ(errorOf([&] { edits.keep(0, 1, large * 2); }), "speed" + tooLarge);
+    EXPECT_EQ(errorOf([&] { edits.hold(large * 2, 1); }), "at" + tooLarge);
+    EXPECT_EQ(errorOf([&] { edits.hold(0, large * 2); }), "duration" + tooLarge);
     edits.keep(0, large);
-    EXPECT_EQ(EditList::read(edits.json(), "a.json").duration(), large);
+    const std::string tooLong =
+        "the edited movie would last more seconds than the largest 64-bit floating-point number";
+    EXPECT_EQ(errorOf([&] { edits.keep(0, large); }), tooLong);
+    EXPECT_EQ(errorOf([&] { edits.keep(0, 1, Rational(1) / large); }), tooLong);
+    EXPECT_EQ(edits.duration(), large);
 }
 
 TEST(EditList, RefusesDenominatorsWithoutEnd) {

@@ -311,7 +311,7 @@ TEST(SessionRecording, ReportsThatReadingFailed) {
          {errorOf([&] { recording.track<CursorLocationKind>(); }),
           errorOf([&] { recording.track<TopmostAppNameKind>(); }),
           errorOf([&] { readEntries<CursorLocationKind>(recording); }), errorOf([&] { recording.duration(); }),
-          errorOf([&] { recording.hiddenStreams(); }), errorOf([&] {
+          errorOf([&] { recording.hiddenStreams(); }), errorOf([&] { recording.hidesStreams(); }), errorOf([&] {
               char byte = 0;
               stream.read(0, {&byte, 1});
           })}) {
@@ -321,6 +321,44 @@ TEST(SessionRecording, ReportsThatReadingFailed) {
     fails = false;
     EXPECT_EQ(recording.track<CursorLocationKind>().size(), 2U); // a failure is not remembered
     EXPECT_EQ(recording.track<TopmostAppNameKind>().size(), 2U);
+}
+
+// ---- Kinds that are none --------------------------------------------------------------------------------------
+
+/// Has the identifier of a kind, but another type of values.
+struct PositionsAsRectangles {
+    using Value = Rect;
+    static constexpr uuid type = CursorLocationKind::type;
+    static constexpr int version = CursorLocationKind::version;
+    static constexpr StreamRole role = StreamRole::State;
+};
+
+/// A kind that the library lists and nobody records.
+struct Miscellany {
+    using Value = std::string;
+    static constexpr uuid type = s_miscellanyUUID;
+    static constexpr int version = 1;
+    static constexpr StreamRole role = StreamRole::State;
+};
+
+template <class Kind>
+constexpr bool hasTrack = requires(const Recording& recording) {
+    recording.track<Kind>();
+};
+
+template <class Kind>
+constexpr bool isRead = requires(const Recording& recording) {
+    recording.read<Kind>([](double, const auto&) { return true; });
+};
+
+TEST(SessionRecording, HasOnlyTracksOfKindsThatAreRecorded) {
+    EXPECT_TRUE(hasTrack<CursorLocationKind>);
+    EXPECT_TRUE(isRead<CursorLocationKind>);
+    EXPECT_FALSE(hasTrack<PositionsAsRectangles>);
+    EXPECT_FALSE(isRead<PositionsAsRectangles>);
+    EXPECT_FALSE(hasTrack<Miscellany>);
+    EXPECT_FALSE(isRead<Miscellany>);
+    EXPECT_FALSE(hasTrack<Point>);
 }
 
 // ---- Threads --------------------------------------------------------------------------------------------------
@@ -338,9 +376,11 @@ TEST(SessionRecording, MayBeReadByManyThreads) {
     std::vector<std::thread> threads;
     for (int i = 0; i < 8; ++i)
         threads.emplace_back([&recording] {
+            EXPECT_EQ(recording.duration(), std::nullopt); // before the walk of another thread, during it or after it
             std::apply([&recording]<class... S>(S...) { (expectSamples<S>(recording), ...); }, EveryKind());
             EXPECT_THAT(recording.hiddenStreams(), IsEmpty());
-            EXPECT_EQ(recording.duration(), std::nullopt);
+            EXPECT_FALSE(recording.hidesStreams());
+            EXPECT_TRUE(recording.at(1).cursor);
         });
     for (std::thread& thread : threads)
         thread.join();

@@ -7,9 +7,13 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <cerrno>
 #include <limits>
 #include <map>
+#include <span>
 #include <string>
+#include <string_view>
+#include <system_error>
 #include <utility>
 #include <vector>
 
@@ -226,6 +230,17 @@ TEST(Retiming, TellsPicturesApartByTheirHotSpotAndSystemCursor) {
     EXPECT_EQ(retimedBytes(stream, editsOf({"0-3"})), stream);
 }
 
+TEST(Retiming, TellsManyHotSpotsOfOnePictureApart) {
+    constexpr int count = 50'000; // comparing each with each would take minutes
+    std::vector<OracleEntry> entries;
+    for (int i = 0; i < count; ++i) {
+        entries.push_back(cursor(i, 7, "arrow"));
+        entries.back().picture->x = i;
+    }
+    const std::string stream = cursors(entries);
+    EXPECT_EQ(retimedBytes(stream, editsOf({"0-50000"})), stream);
+}
+
 TEST(Retiming, CarriesACursorUnlessItsIdentifierAndPictureAreWrittenLast) {
     const std::string stream = cursors({cursor(0, 7, "arrow", 1), cursor(1, 8, "arrow", 1), cursor(2, 7, "", 2)});
     EXPECT_EQ(retimedBytes(stream, editsOf({"0-1", "2.5-3", "1.5-2"})), // other flags are no other cursor
@@ -366,6 +381,13 @@ TEST(Retiming, NamesWhatTheFileLacks) {
     EXPECT_THAT(none.streams, IsEmpty());
 }
 
+TEST(Retiming, NamesStreamsThatDamageHides) {
+    const std::string damaged = media() + extendedAtom("ZULM", extendedAtom("DATA", points({{1, 1}})) + "tail");
+    const Result result = retimedMovie(damaged, editsOf({"0-9"}));
+    EXPECT_THAT(result.streams, ElementsAre(points({{1, 1}})));
+    EXPECT_THAT(result.edited.losses, ElementsAre("the metadata is damaged, so that streams may be missing"));
+}
+
 TEST(Retiming, HandsTheBytesToAFunction) {
     const std::string region = streamHeader(s_regions, 1, 24);
     const std::string movie = media() + zulmAtom({points({{1, 1}}), region, points({{2, 2}}, s_scrolls)});
@@ -381,6 +403,43 @@ TEST(Retiming, HandsTheBytesToAFunction) {
     EXPECT_EQ(streams["scrollAction"], points({{1, 2}}, s_scrolls));
     EXPECT_EQ(streams["recordingRegion"], region);
     EXPECT_EQ(sunk.size(), 24U + 16 + 24 + 16);
+}
+
+TEST(Retiming, PassesOnWhatTheFunctionThrows) {
+    const std::string movie = media() + zulmAtom({points({{1, 1}})});
+    const Recording recording(ByteSource::memory(movie), "Movie.mp4");
+    const auto isFull = [](std::string_view) { throw std::system_error(ENOSPC, std::generic_category()); };
+    EXPECT_THROW(retimed(recording, editsOf({"1-4"}), isFull), std::system_error);
+}
+
+TEST(Retiming, NamesAFileThatChangesWhileItIsRead) {
+    const std::string movie =
+        media() + zulmAtom({points({{2, 2}, {1, 1}}), texts({{1, "A"}, {2, "B"}}), actions({{1, 1}}),
+                            cursors({cursor(0, 7, "arrow"), cursor(1, 7, "hand")})});
+    int reads = 0;
+    int readsUntilTheChange = std::numeric_limits<int>::max();
+    const ByteSource changing(movie.size(), [&](std::uint64_t position, std::span<char> bytes) {
+        return reads++ < readsUntilTheChange ? ByteSource::memory(movie).read(position, bytes) : 0;
+    });
+    const Recording recording(changing, "Movie.mp4");
+    recording.hiddenStreams(); // is remembered
+    const EditList edits = editsOf({"0-9", "h1-1", "0-1"});
+    const auto retimedAfter = [&](int readsBefore) {
+        reads = 0;
+        readsUntilTheChange = readsBefore;
+        return retimed(recording, edits);
+    };
+    EXPECT_EQ(retimedAfter(readsUntilTheChange).streams.size(), 4U);
+    int refusals = 0;
+    for (int before = reads - 1; before >= 0; --before)
+        try {
+            const EditedRecording edited = retimedAfter(before);
+            EXPECT_FALSE(edited.losses.empty());
+        } catch (const Error& error) {
+            ++refusals;
+            EXPECT_STREQ(error.what(), "Movie.mp4: has changed while it was read; try again");
+        }
+    EXPECT_GT(refusals, 0);
 }
 
 TEST(Retiming, RetimesManyEntries) {

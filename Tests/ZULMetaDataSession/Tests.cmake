@@ -7,6 +7,7 @@ zulm_add_tests(ZULMetaDataSessionTests
   EditLists/LosslessCutTest
   EditLists/MovieEditListTest
   EditLists/OpenTimelineTest
+  Insights/ActivityTest
   Insights/CameraTest
   Insights/ChaptersTest
   Insights/ClicksTest

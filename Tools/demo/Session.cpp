@@ -3,7 +3,9 @@
 #include "Tools/demo/Cursors.h"
 
 #include <cmath>
+#include <cstddef>
 #include <cstdint>
+#include <iterator>
 
 namespace ZULMetaData::Demo {
 
@@ -36,9 +38,51 @@ std::vector<MediaTime> every(int rate) {
     return times;
 }
 
-/// Wanders over the recorded region and rests now and then.
+struct ButtonChange {
+    double time;
+    std::int32_t action;
+    const char* text;
+};
+
+/// Each press is followed by its release. With shift something is dragged.
+constexpr ButtonChange s_buttonChanges[]{{0, 256, "mouse init"},
+                                         {1.5, 1, "left down"},
+                                         {1.6, 2, "left up"},
+                                         {4.2, 1 + 16, "left down + shift"},
+                                         {4.9, 2 + 16, "left up + shift"},
+                                         {8, 4, "right down"},
+                                         {8.15, 8, "right up"},
+                                         {11, 1 + 128, "left down + cmd"},
+                                         {11.1, 2 + 128, "left up + cmd"},
+                                         {14.4, 16, "middle down"},
+                                         {14.5, 32, "middle up"},
+                                         {18.3, 1, "left down"},
+                                         {18.4, 2, "left up"}};
+
+/// The hand stands still from shortly before a press until shortly after its release. It hurries before and afterwards,
+/// so that it is late for nothing else.
+double timeOfHand(double seconds) {
+    constexpr double least = 0.5; // of what is dragged
+    constexpr double still = 0.05;
+    constexpr double hurry = 0.3;
+    for (std::size_t i = 1; i + 1 < std::size(s_buttonChanges); i += 2) {
+        const double press = s_buttonChanges[i].time;
+        const double release = s_buttonChanges[i + 1].time;
+        const double from = press - still - hurry;
+        const double to = release + still + hurry;
+        if (release - press > least || seconds <= from || seconds >= to)
+            continue;
+        if (seconds < press - still)
+            return from + (seconds - from) * (press - from) / hurry;
+        return seconds <= release + still ? press : to - (to - seconds) * (to - press) / hurry;
+    }
+    return seconds;
+}
+
+/// Wanders over the recorded region, and rests now and then.
 ScreenPoint cursorAt(double seconds) {
-    const double moving = seconds - 0.35 * std::sin(2 * seconds);
+    const double hand = timeOfHand(seconds);
+    const double moving = hand - 0.35 * std::sin(2 * hand);
     return {s_region.x + s_region.width * (0.5 + 0.42 * std::sin(0.9 * moving)),
             s_region.y + s_region.height * (0.5 + 0.4 * std::sin(1.3 * moving + 0.6))};
 }
@@ -202,29 +246,10 @@ Track recordSystemData(const FileLocation& folder) {
     return track;
 }
 
-struct Click {
-    double time;
-    std::int32_t action;
-    const char* text;
-};
-
 Track recordCursorAction(const FileLocation& folder) {
-    static constexpr Click clicks[]{{0, 256, "mouse init"},
-                                    {1.5, 1, "left down"},
-                                    {1.6, 2, "left up"},
-                                    {4.2, 1 + 16, "left down + shift"},
-                                    {4.9, 2 + 16, "left up + shift"},
-                                    {8, 4, "right down"},
-                                    {8.15, 8, "right up"},
-                                    {11, 1 + 128, "left down + cmd"},
-                                    {11.1, 2 + 128, "left up + cmd"},
-                                    {14.4, 16, "middle down"},
-                                    {14.5, 32, "middle up"},
-                                    {18.3, 1, "left down"},
-                                    {18.4, 2, "left up"}};
     Track track = newTrack<CursorActionMetaDataParser>("cursorAction", folder);
     CursorActionMetaDataWriter writer(track.file);
-    for (const Click& click : clicks) {
+    for (const ButtonChange& click : s_buttonChanges) {
         writer.write(click.action, at(click.time));
         expect(track, {{"action", click.text}, {"rawActionValue", click.action}}, at(click.time));
     }

@@ -154,19 +154,21 @@ void AccessibilityProcess::windowChanged(std::uint32_t process) {
     send(fmt::format("window {}\n", process));
 }
 
-void AccessibilityProcess::ask() {
-    if (asked_ || !isAlive())
+void AccessibilityProcess::ask(Instant interval) {
+    const Instant instant = now();
+    if (asked_ || !isAlive() || instant < lastAsked_ + interval)
         return;
-    asked_ = now();
+    asked_ = lastAsked_ = instant;
     askedWindow_ = windows_;
     send("ask\n");
 }
 
-void AccessibilityProcess::askHover(Position pointer) {
+bool AccessibilityProcess::askHover(Position pointer) {
     if (isHovering_ || !isAlive())
-        return;
+        return false;
     isHovering_ = true;
     send(fmt::format("hover {} {}\n", pointer.x, pointer.y));
+    return true;
 }
 
 } // namespace Recorder

@@ -44,11 +44,12 @@ public:
     /// Another window is on top. The answer tells its focus.
     void windowChanged(std::uint32_t process);
 
-    /// Asks for the focus of the window on top, unless such a question waits for its answer.
-    void ask();
+    /// Asks for the focus of the window on top, unless such a question waits for its answer or is younger than
+    /// `interval`: each one makes the applications work.
+    void ask(Instant interval);
 
-    /// Asks what the pointer hovers over, unless such a question waits for its answer.
-    void askHover(Position pointer);
+    /// Asks what the pointer hovers over. Returns false if such a question waits for its answer.
+    bool askHover(Position pointer);
 
 private:
     bool readLines(const std::function<void(const std::string&)>& take);
@@ -59,8 +60,9 @@ private:
     FileHandle input_;
     FileHandle output_;
     std::string pending_;
-    std::uint64_t windows_ = 0; ///< how many windows came to the top
-    std::optional<Instant> asked_;
+    std::uint64_t windows_ = 0;    ///< how many windows came to the top
+    std::optional<Instant> asked_; ///< when the question was asked that waits
+    Instant lastAsked_ = 0;
     std::uint64_t askedWindow_ = 0;
     bool isHovering_ = false;
 };

@@ -17,6 +17,7 @@ namespace Recorder {
 namespace {
 
 constexpr int s_callTimeout = 400;   ///< milliseconds of one call
+constexpr int s_deepest = 64;        ///< objects that are in each other
 constexpr int s_visitedAtMost = 600; ///< objects, in search of the focus
 
 struct ObjectDeleter {
@@ -37,6 +38,7 @@ private:
     void obey(const std::string& line);
     void say(const std::string& line);
     void answerHover(int x, int y);
+    static Object<AtspiAccessible> innermostAt(AtspiAccessible* outer, int x, int y);
     Object<AtspiAccessible> applicationOf(std::uint32_t process);
     Object<AtspiAccessible> activeWindowOf(AtspiAccessible* application);
     Object<AtspiAccessible> focusIn(AtspiAccessible* accessible, int& visits);
@@ -202,13 +204,26 @@ const char* Watcher::currentFocus() {
     return focus_ ? kindOf(focus_.get()) : nullptr;
 }
 
+/// Some applications answer with the innermost object, others with the child that it is in.
+Object<AtspiAccessible> Watcher::innermostAt(AtspiAccessible* outer, int x, int y) {
+    Object<AtspiAccessible> found;
+    for (int depth = 0; depth < s_deepest; ++depth) {
+        AtspiAccessible* around = found ? found.get() : outer;
+        const Object<AtspiComponent> component(atspi_accessible_get_component_iface(around));
+        Object<AtspiAccessible> next(
+            component ? atspi_component_get_accessible_at_point(component.get(), x, y, ATSPI_COORD_TYPE_SCREEN, nullptr)
+                      : nullptr);
+        if (!next || next.get() == around)
+            break;
+        found = std::move(next);
+    }
+    return found;
+}
+
 void Watcher::answerHover(int x, int y) {
     const Object<AtspiAccessible> application = process_ ? applicationOf(process_) : nullptr;
     const Object<AtspiAccessible> window = application ? activeWindowOf(application.get()) : nullptr;
-    const Object<AtspiComponent> component(window ? atspi_accessible_get_component_iface(window.get()) : nullptr);
-    const Object<AtspiAccessible> found(
-        component ? atspi_component_get_accessible_at_point(component.get(), x, y, ATSPI_COORD_TYPE_SCREEN, nullptr)
-                  : nullptr);
+    const Object<AtspiAccessible> found = window ? innermostAt(window.get(), x, y) : nullptr;
     const Object<AtspiComponent> inner(found ? atspi_accessible_get_component_iface(found.get()) : nullptr);
     AtspiRect* area = inner ? atspi_component_get_extents(inner.get(), ATSPI_COORD_TYPE_SCREEN, nullptr) : nullptr;
     std::ostringstream line;

@@ -2,6 +2,7 @@
 
 // The atoms of a movie's index, taken apart and put together in memory.
 
+#include <algorithm>
 #include <cstddef>
 #include <cstdint>
 #include <span>
@@ -21,7 +22,10 @@ public:
     std::uint64_t u64() { return number(8); }
     std::int32_t i32() { return static_cast<std::int32_t>(u32()); }
     std::uint8_t u8() { return static_cast<std::uint8_t>(number(1)); }
-    void skip(std::size_t count) { number(count); }
+    void skip(std::size_t count) {
+        isWhole_ = isWhole_ && left() >= count;
+        position_ += std::min(count, left());
+    }
 
     bool isWhole() const { return isWhole_; }
     std::size_t left() const { return bytes_.size() - position_; }
@@ -97,8 +101,8 @@ public:
 
 private:
     void number(std::uint64_t value, std::size_t size) {
-        for (std::size_t i = size; i-- > 0;)
-            bytes_.push_back(static_cast<std::uint8_t>(value >> (8 * i)));
+        for (std::size_t i = 1; i <= size; ++i)
+            bytes_.push_back(static_cast<std::uint8_t>(value >> (8 * (size - i))));
     }
     void setU32(std::size_t position, std::uint32_t value) {
         for (std::size_t i = 0; i < 4; ++i)

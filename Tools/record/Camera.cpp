@@ -99,7 +99,7 @@ void Camera::finish(Instant end) {
     encoding_.join();
     const Instant length = std::min(end, pausedAt_.value_or(end)) - zero_.value_or(end) - paused_;
     if (error_.empty())
-        writer_.finish(length * s_pictureTimescale / s_second);
+        writer_.finish(inUnits(length, s_pictureTimescale));
 }
 
 std::optional<Instant> Camera::movieLength(Instant instant) const {
@@ -199,8 +199,7 @@ std::optional<std::int64_t> Camera::movieTime(Instant instant) {
             zero_ = instant;
             countTicksFrom(instant);
         }
-        const Instant length = instant - *zero_ - paused_;
-        time = std::max(lastTime_ + 1, (length * s_pictureTimescale + s_second / 2) / s_second);
+        time = std::max(lastTime_ + 1, inUnits(instant - *zero_ - paused_, s_pictureTimescale));
         lastTime_ = time;
     }
     if (isFirst)
@@ -230,8 +229,21 @@ Instant Camera::tick(std::int64_t number) const {
     return firstTick_ + number * s_second / settings_.fps;
 }
 
+FramePointer Camera::emptyPicture() {
+    FramePointer frame;
+    {
+        const std::lock_guard lock(mutex_);
+        if (!used_.empty()) {
+            frame = std::move(used_.back());
+            used_.pop_back();
+        }
+    }
+    const bool isFree = frame && av_frame_is_writable(frame.get()) > 0; // an encoder may keep it
+    return isFree ? std::move(frame) : writer_.emptyPicture();
+}
+
 FramePointer Camera::converted(const GrabbedPicture& grabbed) {
-    FramePointer frame = writer_.emptyPicture();
+    FramePointer frame = emptyPicture();
     const std::array<const std::uint8_t*, 4> source{grabbed.pixels, nullptr, nullptr, nullptr};
     const std::array<int, 4> lines{grabbed.bytesPerLine, 0, 0, 0};
     sws_scale(scaler_, source.data(), lines.data(), 0, settings_.height, frame->data, frame->linesize);
@@ -255,6 +267,8 @@ void Camera::encodePictures() {
             giveUp(error.what());
             return;
         }
+        const std::lock_guard lock(mutex_);
+        used_.push_back(std::move(picture.frame));
     }
 }
 

@@ -15,6 +15,7 @@
 #include <optional>
 #include <string>
 #include <thread>
+#include <vector>
 
 struct SwsContext;
 
@@ -72,6 +73,7 @@ private:
     void skipMissedTicks();
     void countTicksFrom(Instant instant);
     Instant tick(std::int64_t number) const;
+    FramePointer emptyPicture();
     FramePointer converted(const GrabbedPicture& grabbed);
     std::optional<std::int64_t> movieTime(Instant instant);
     void giveUp(const std::string& why);
@@ -85,6 +87,7 @@ private:
     mutable std::mutex mutex_;
     std::condition_variable changed_;
     std::deque<Picture> queue_;
+    std::vector<FramePointer> used_; ///< pictures that are encoded, whose memory is used again
     std::optional<Instant> zero_;
     std::optional<Instant> pausedAt_;
     Instant resumedAt_ = 0;

@@ -19,19 +19,14 @@ namespace Recorder {
 
 namespace {
 
+constexpr std::uint64_t s_shortHeader = 8; ///< of an atom whose size has 32 bits
 constexpr std::uint32_t s_moov = boxType("moov");
 constexpr std::uint32_t s_moof = boxType("moof");
 constexpr std::uint32_t s_free = boxType("free");
 constexpr std::uint64_t s_largestIndex = std::uint64_t{64} << 20;
-constexpr std::uint32_t s_primingOfAAC = 1024; ///< samples that the encoder puts before the sound
-
-/// An atom of the file, which is not in memory.
-struct FileBox {
-    std::uint64_t offset = 0;
-    std::uint64_t size = 0;
-    std::uint64_t headerSize = 8;
-    std::uint32_t type = 0;
-};
+constexpr std::uint64_t s_longestMovie = 1'000'000'000; ///< seconds, so that no product of times overflows
+constexpr std::uint32_t s_longestRun = 1 << 16;         ///< samples whose sizes are not told one by one
+constexpr std::uint32_t s_primingOfAAC = 1024;          ///< samples that the encoder puts before the sound
 
 bool readAt(int file, std::uint64_t offset, std::span<std::uint8_t> bytes) {
     std::size_t done = 0;
@@ -55,13 +50,21 @@ bool writeAt(int file, std::uint64_t offset, std::span<const std::uint8_t> bytes
     return true;
 }
 
+/// An atom of the file, which is not in memory.
+struct FileBox {
+    std::uint64_t offset = 0;
+    std::uint64_t size = 0;
+    std::uint64_t headerSize = s_shortHeader;
+    std::uint32_t type = 0;
+};
+
 /// Returns the atom at `offset` if it is whole.
 std::optional<FileBox> boxAt(int file, std::uint64_t offset, std::uint64_t end) {
     std::array<std::uint8_t, 16> header{};
     if (end - offset < 8 || !readAt(file, offset, std::span(header).first(8)))
         return std::nullopt;
     BoxReader reader(header);
-    FileBox box{offset, reader.u32(), 8, reader.u32()};
+    FileBox box{offset, reader.u32(), s_shortHeader, reader.u32()};
     if (box.size == 1) {
         if (end - offset < 16 || !readAt(file, offset, header))
             return std::nullopt;
@@ -73,11 +76,12 @@ std::optional<FileBox> boxAt(int file, std::uint64_t offset, std::uint64_t end) 
     return box;
 }
 
-/// What an atom was before it became free space: the first atom in it tells.
-std::uint32_t formerType(const FileBox& box, const Bytes& bytes) {
-    if (box.type != s_free || bytes.size() < 16)
+/// Indexes are told by the first atom in them, also after they became free space.
+std::uint32_t typeOf(const FileBox& box, const Bytes& bytes) {
+    if (box.type != s_moov && box.type != s_moof && box.type != s_free)
         return box.type;
-    const std::uint32_t first = BoxReader(std::span(bytes).subspan(12)).u32();
+    constexpr std::size_t innerType = 12;
+    const std::uint32_t first = bytes.size() < 16 ? 0 : BoxReader(std::span(bytes).subspan(innerType)).u32();
     return first == boxType("mvhd") ? s_moov : first == boxType("mfhd") ? s_moof : s_free;
 }
 
@@ -116,13 +120,13 @@ FragmentedMovie::FragmentedMovie(int file, const std::string& name) : name_(name
         const std::uint64_t offset = std::exchange(next, next + box->size);
         Bytes bytes;
         if (box->type == s_moov || box->type == s_moof || box->type == s_free) {
-            if (box->size > s_largestIndex)
-                break;
+            if (box->size > s_largestIndex || box->headerSize != s_shortHeader)
+                break; // the recorder writes neither
             bytes.resize(static_cast<std::size_t>(box->size));
             if (!readAt(file, offset, bytes))
                 break;
         }
-        const std::uint32_t type = formerType(*box, bytes);
+        const std::uint32_t type = typeOf(*box, bytes);
         if (type == s_moov && movie_.empty()) {
             readMovieBox(std::move(bytes));
             hidden_.push_back(offset);
@@ -131,10 +135,11 @@ FragmentedMovie::FragmentedMovie(int file, const std::string& name) : name_(name
             fragment = std::move(bytes);
             fragmentOffset = offset;
         } else if (type == boxType("mdat") && fragment) {
-            readFragment(*fragment, fragmentOffset);
+            if (!readFragment(*fragment, fragmentOffset, {offset + box->headerSize, next}))
+                break;
             hidden_.push_back(fragmentOffset);
             fragment.reset();
-            wholeBytes_ = offset + box->size;
+            wholeBytes_ = next;
         }
     }
     if (movie_.empty() || tracks_.empty())
@@ -171,55 +176,92 @@ void FragmentedMovie::readMovieBox(Bytes movie) {
     }
 }
 
-void FragmentedMovie::readFragment(const Bytes& fragment, std::uint64_t offset) {
-    for (const Box& box : boxesIn(std::span(fragment).subspan(8)))
-        if (box.type == boxType("traf"))
-            readTrackFragment(box, offset);
+/// Takes nothing of a fragment whose samples are not all in its media.
+bool FragmentedMovie::readFragment(const Bytes& fragment, std::uint64_t offset, const Media& media) {
+    std::vector<SampleRun> runs;
+    for (const Box& box : boxesIn(std::span(fragment).subspan(s_shortHeader)))
+        if (box.type == boxType("traf") && !readTrackFragment(box, offset, media, runs))
+            return false;
+    std::uint64_t left = media.end - media.begin;
+    for (const SampleRun& run : runs) {
+        if (run.bytes > left)
+            return false;
+        left -= run.bytes;
+    }
+    for (SampleRun& run : runs) {
+        std::vector<Sample>& samples = run.track->samples;
+        samples.insert(samples.end(), run.samples.begin(), run.samples.end());
+        if (run.chunk.samples > 0)
+            run.track->chunks.push_back(run.chunk);
+    }
+    return true;
 }
 
-void FragmentedMovie::readTrackFragment(const Box& box, std::uint64_t fragmentOffset) {
+/// Returns false if the atom is damaged.
+bool FragmentedMovie::readTrackFragment(const Box& box, std::uint64_t fragmentOffset, const Media& media,
+                                        std::vector<SampleRun>& runs) {
     BoxReader header(childOf(box, boxType("tfhd")).payload);
     const std::uint32_t flags = header.u32();
     Track* track = trackOf(header.u32());
     if (!track || !header.isWhole())
-        return;
+        return false;
     const std::uint64_t base = (flags & 0x1) != 0 ? header.u64() : fragmentOffset;
     if ((flags & 0x2) != 0)
         header.skip(4);
-    const std::uint32_t duration = (flags & 0x8) != 0 ? header.u32() : track->defaultDuration;
-    const std::uint32_t size = (flags & 0x10) != 0 ? header.u32() : track->defaultSize;
-    const std::uint32_t sampleFlags = (flags & 0x20) != 0 ? header.u32() : track->defaultFlags;
+    Sample usual;
+    usual.duration = (flags & 0x8) != 0 ? header.u32() : track->defaultDuration;
+    usual.size = (flags & 0x10) != 0 ? header.u32() : track->defaultSize;
+    const std::uint32_t usualFlags = (flags & 0x20) != 0 ? header.u32() : track->defaultFlags;
     BoxReader start(childOf(box, boxType("tfdt")).payload);
     const bool isWide = start.u32() >> 24 == 1;
-    std::uint64_t time = isWide ? start.u64() : start.u32();
+    usual.time = isWide ? start.u64() : start.u32();
+    if (!header.isWhole() || !start.isWhole() || usual.time > s_longestMovie * track->timescale)
+        return false;
     for (const Box& run : boxesIn(box.payload)) {
         if (run.type != boxType("trun"))
             continue;
-        BoxReader reader(run.payload);
-        const std::uint32_t has = reader.u32();
-        const std::uint32_t count = reader.u32();
-        Chunk chunk{base, 0};
-        if ((has & 0x1) != 0)
-            chunk.offset = base + static_cast<std::uint64_t>(std::int64_t{reader.i32()});
-        const std::uint32_t firstFlags = (has & 0x4) != 0 ? reader.u32() : sampleFlags;
-        for (std::uint32_t i = 0; i < count && reader.isWhole(); ++i) {
-            Sample sample;
-            sample.time = time;
-            sample.duration = (has & 0x100) != 0 ? reader.u32() : duration;
-            sample.size = (has & 0x200) != 0 ? reader.u32() : size;
-            const std::uint32_t own = (has & 0x400) != 0 ? reader.u32() : i == 0 ? firstFlags : sampleFlags;
-            if ((has & 0x800) != 0)
-                reader.skip(4); // pictures are shown in the order in which they are decoded
-            sample.isSync = (own & 0x10000) == 0;
-            if (!reader.isWhole())
-                break;
-            time += sample.duration;
-            track->samples.push_back(sample);
-            ++chunk.samples;
-        }
-        if (chunk.samples > 0)
-            track->chunks.push_back(chunk);
+        SampleRun& read = runs.emplace_back();
+        read.track = track;
+        if (!readRun(run, base, usualFlags, media, usual, read))
+            return false;
     }
+    return true;
+}
+
+/// `usual` is what the samples are unless the run says otherwise, and has the time of the next one.
+bool FragmentedMovie::readRun(const Box& box, std::uint64_t base, std::uint32_t usualFlags, const Media& media,
+                              Sample& usual, SampleRun& run) {
+    BoxReader reader(box.payload);
+    const std::uint32_t has = reader.u32();
+    const std::uint32_t count = reader.u32();
+    const std::int64_t distance = (has & 0x1) != 0 ? reader.i32() : 0;
+    if (base > media.end || static_cast<std::int64_t>(base) + distance < 0)
+        return false;
+    run.chunk.offset = static_cast<std::uint64_t>(static_cast<std::int64_t>(base) + distance);
+    const std::uint32_t firstFlags = (has & 0x4) != 0 ? reader.u32() : usualFlags;
+    const bool tellsSizes = (has & 0x200) != 0;
+    if (run.chunk.offset < media.begin || run.chunk.offset > media.end || (!tellsSizes && count > s_longestRun))
+        return false;
+    for (std::uint32_t i = 0; i < count; ++i) {
+        Sample sample = usual;
+        if ((has & 0x100) != 0)
+            sample.duration = reader.u32();
+        if (tellsSizes)
+            sample.size = reader.u32();
+        const std::uint32_t own = (has & 0x400) != 0 ? reader.u32() : i == 0 ? firstFlags : usualFlags;
+        if ((has & 0x800) != 0)
+            reader.skip(4); // pictures are shown in the order in which they are decoded
+        sample.isSync = (own & 0x10000) == 0;
+        run.bytes += sample.size;
+        if (!reader.isWhole() || sample.size == 0 || run.bytes > media.end - run.chunk.offset)
+            return false;
+        usual.time += sample.duration;
+        if (usual.time > s_longestMovie * run.track->timescale)
+            return false;
+        run.samples.push_back(sample);
+        ++run.chunk.samples;
+    }
+    return true;
 }
 
 FragmentedMovie::Track* FragmentedMovie::trackOf(std::uint32_t id) {
@@ -241,7 +283,8 @@ double FragmentedMovie::duration() const {
 }
 
 std::uint64_t FragmentedMovie::inMovieTime(const Track& track, std::uint64_t duration) const {
-    return (duration * timescale_ + track.timescale / 2) / track.timescale;
+    return duration / track.timescale * timescale_ +
+           (duration % track.timescale * timescale_ + track.timescale / 2) / track.timescale;
 }
 
 void FragmentedMovie::makeOrdinary(int file) const {

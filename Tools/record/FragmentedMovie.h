@@ -50,9 +50,25 @@ private:
         std::vector<Chunk> chunks;
     };
 
+    /// Where the bytes of a fragment's samples are in the file.
+    struct Media {
+        std::uint64_t begin;
+        std::uint64_t end;
+    };
+    /// Samples of one track that follow each other in the file.
+    struct SampleRun {
+        Track* track = nullptr;
+        Chunk chunk;
+        std::uint64_t bytes = 0;
+        std::vector<Sample> samples;
+    };
+
     void readMovieBox(Bytes movie);
-    void readFragment(const Bytes& fragment, std::uint64_t offset);
-    void readTrackFragment(const Box& box, std::uint64_t fragmentOffset);
+    bool readFragment(const Bytes& fragment, std::uint64_t offset, const Media& media);
+    bool readTrackFragment(const Box& box, std::uint64_t fragmentOffset, const Media& media,
+                           std::vector<SampleRun>& runs);
+    static bool readRun(const Box& box, std::uint64_t base, std::uint32_t usualFlags, const Media& media, Sample& usual,
+                        SampleRun& run);
     Track* trackOf(std::uint32_t id);
     std::uint64_t durationOf(const Track& track) const;
     std::uint64_t inMovieTime(const Track& track, std::uint64_t duration) const;

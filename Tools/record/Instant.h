@@ -18,6 +18,11 @@ Instant now();
 /// Waits until `instant`, or returns at once if it has passed.
 void sleepUntil(Instant instant);
 
+/// Returns a length of nanoseconds in units of which `scale` are a second, also if the length is of many days.
+constexpr std::int64_t inUnits(Instant length, std::int64_t scale) {
+    return length / s_second * scale + (length % s_second * scale + s_second / 2) / s_second;
+}
+
 /// Returns the middle between two instants.
 constexpr Instant middleOf(Instant first, Instant second) {
     return first + (second - first) / 2;

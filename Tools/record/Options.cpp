@@ -6,23 +6,14 @@
 #include <fmt/core.h>
 
 #include <cstdio>
-#include <cstdlib>
 #include <map>
+#include <memory>
+#include <sstream>
 #include <utility>
 
 namespace Recorder {
 
 namespace {
-
-constexpr auto s_footer = R"(Everything lies in OUT.mp4.recording until OUT.mp4 is whole. Ctrl-C ends a recording well.
-
-Keys: 'shortcuts' records keys that type no character, and keys with Ctrl, Alt or Super. 'all' records what is typed,
-but not into password fields, which the accessibility bus tells apart. Terminals show no password fields: what is typed
-into one, such as a password for sudo, is recorded like any other text.
-
-  zulm record -o Talk.mp4 --duration 60
-  zulm record --stop
-  zulm record --recover Talk.mp4.recording)";
 
 /// Reads "X,Y,WxH".
 Area areaOf(const std::string& text) {
@@ -34,6 +25,37 @@ Area areaOf(const std::string& text) {
     return area;
 }
 
+/// The page of --help, as wide as a terminal.
+class HelpPage final : public CLI::Formatter {
+public:
+    HelpPage() { column_width(s_descriptionColumn); }
+    std::string make_option_desc(const CLI::Option* option) const override {
+        return wrapped(option->get_description(), s_descriptionColumn);
+    }
+    std::string make_description(const CLI::App* app) const override {
+        return wrapped(app->get_description(), 0) + "\n\n";
+    }
+
+private:
+    static constexpr std::size_t s_descriptionColumn = 28;
+    static constexpr std::size_t s_pageWidth = 80;
+
+    /// In lines that begin at this column; the formatter puts them there.
+    static std::string wrapped(const std::string& text, std::size_t begin) {
+        std::string lines;
+        std::size_t column = begin;
+        std::istringstream words(text);
+        for (std::string word; words >> word; column += word.size()) {
+            const bool fits = column + 1 + word.size() <= s_pageWidth;
+            if (column > begin)
+                lines += fits ? ' ' : '\n';
+            column = fits ? column + 1 : begin;
+            lines += word;
+        }
+        return lines;
+    }
+};
+
 void requireOutput(const Options& options) {
     const std::string extension = options.output.extension().string();
     if (options.output.empty())
@@ -42,10 +64,10 @@ void requireOutput(const Options& options) {
         throw Refusal(fmt::format("{}: the name of the movie must end in .mp4", options.output.string()));
 }
 
-void requireSense(const Options& options, bool hasRecover) {
-    if (options.task == Task::Record)
-        requireOutput(options);
-    if (options.deletesFolder && !hasRecover)
+void requireSense(const Options& options, const GivenOptions& given) {
+    if (given.pause + given.resume + given.stop + (given.recover ? 1 : 0) > 1)
+        throw Refusal("give one of --pause, --resume, --stop and --recover");
+    if (options.deletesFolder && !given.recover)
         throw Refusal("--delete can only be given together with --recover");
     if (options.stopsOnClose && options.window.empty())
         throw Refusal("--stop-on-close can only be given together with --window");
@@ -54,47 +76,72 @@ void requireSense(const Options& options, bool hasRecover) {
     const int places = (options.region ? 1 : 0) + (options.window.empty() ? 0 : 1) + (options.monitor.empty() ? 0 : 1);
     if (places > 1)
         throw Refusal("give one of --region, --window and --monitor");
+    if (options.task == Task::Record)
+        requireOutput(options);
 }
 
-} // namespace
+void addControl(CLI::App& app, GivenOptions& given) {
+    app.add_flag("--pause", given.pause, "Pause the recorder that is running");
+    app.add_flag("--resume", given.resume, "Let it go on");
+    app.add_flag("--stop", given.stop, "End it, and wait until its movie is whole");
+    app.add_option("--recover", given.recover, "Make a movie of what a recorder left that was killed")
+        ->type_name("FOLDER");
+    app.add_flag("--delete", given.options.deletesFolder, "With --recover, remove the folder if the movie is whole");
+    app.add_option("--socket", given.socket,
+                   "The socket by which the recorder is controlled, if several run; one in the user's runtime folder "
+                   "unless it is given")
+        ->type_name("FILE");
+}
 
-std::optional<Options> optionsOf(int argc, char** argv) {
-    Options options;
-    CLI::App app("Record the screen of an X display, with the cursor, clicks, keys and windows as metadata");
-    app.name("zulm record");
-    app.footer(s_footer);
-    std::string region;
-    std::string output;
-    std::string recover;
-    std::string sound;
-    std::string socket;
-    double duration = 0;
-    bool pause = false;
-    bool resume = false;
-    bool stop = false;
-    bool watch = false;
-    app.set_version_flag("--version", ZULM_VERSION);
-    app.add_option("-o,--output", output, "The movie to make; it must not exist")->type_name("OUT.mp4");
-    app.add_option("--display", options.display, "The X display instead of $DISPLAY");
-    app.add_option("--region", region, "Record a part of the screen")->type_name("X,Y,WxH");
-    app.add_option("--window", options.window, "Record one window: its title or a part of it, its number, or 'click'");
-    app.add_option("--monitor", options.monitor, "Record one monitor, by its name in xrandr");
+void addPlace(CLI::App& app, GivenOptions& given) {
+    Options& options = given.options;
+    app.add_option("--display", options.display, "The X display instead of $DISPLAY")->type_name("DISPLAY");
+    app.add_option("--region", given.region, "Record this part of the screen, in pixels")->type_name("X,Y,WxH");
+    app.add_option("--window", options.window,
+                   "Record one window: its title or a part of it, its number, or 'click' to choose it by a click")
+        ->type_name("WINDOW");
+    app.add_option("--monitor", options.monitor, "Record one monitor, by its name in xrandr")->type_name("NAME");
     app.add_flag("--stop-on-close", options.stopsOnClose, "End when the window of --window is closed");
-    CLI::Option* durationOption = app.add_option("--duration", duration, "End after so many seconds of recording");
-    app.add_option("--fps", options.video.fps, "Frames a second, 30 by default")->check(CLI::Range(1, 60));
-    app.add_option("--codec", options.video.codec, "An encoder of libavcodec, h264 by default");
-    app.add_option("--quality", options.video.quality, "From 0, the best, to 51; 20 by default")
-        ->check(CLI::Range(0, 51));
-    CLI::Option* soundOption =
-        app.add_option("--audio", sound, "Record sound, from this source of PulseAudio or from the default one")
-            ->expected(0, 1);
-    const std::map<std::string, KeyMode> modes{
-        {"none", KeyMode::Nothing}, {"shortcuts", KeyMode::Shortcuts}, {"all", KeyMode::Everything}};
-    app.add_option("--keys", options.keys, "Which keys are recorded: none, shortcuts (default) or all")
-        ->transform(CLI::CheckedTransformer(modes));
+}
+
+void addMovie(CLI::App& app, GivenOptions& given) {
+    VideoSettings& video = given.options.video;
+    app.add_option("--duration", given.duration, "End after so many seconds of recording")->type_name("SECONDS");
+    app.add_option("--fps", video.fps, "Frames a second, from 1 to 60; 30 unless it is given")
+        ->type_name("N")
+        ->check(CLI::Range(1, 60).description(""));
+    app.add_option("--codec", video.codec, "An encoder of libavcodec; h264 unless it is given")->type_name("NAME");
+    app.add_option("--quality", video.quality, "From 0, the best, to 51; 20 unless it is given")
+        ->type_name("N")
+        ->check(CLI::Range(0, 51).description(""));
+    app.add_option("--audio", given.sound, "Record sound, from this source of PulseAudio or from the default one")
+        ->type_name("[SOURCE]")
+        ->expected(0, 1);
+}
+
+void addPrivacy(CLI::App& app, Options& options) {
+    const auto numbered = [](std::string& word) {
+        const std::map<std::string, KeyMode> modes{
+            {"none", KeyMode::Nothing}, {"shortcuts", KeyMode::Shortcuts}, {"all", KeyMode::Everything}};
+        const auto found = modes.find(word);
+        if (found == modes.end())
+            return fmt::format("'{}' is not none, shortcuts or all", word);
+        word = std::to_string(static_cast<int>(found->second));
+        return std::string();
+    };
+    app.add_option("--keys", options.keys,
+                   "Which keys are recorded: none; shortcuts (unless it is given), which are keys that type no "
+                   "character and keys with Ctrl, Alt or Super; or all. What is pressed in a password field, which the "
+                   "accessibility bus tells apart, is left out, and so is everything in applications that tell it "
+                   "nothing. Terminals show no password fields: if a terminal uses the bus, what is typed into it, "
+                   "such as a password for sudo, is recorded like any other text")
+        ->type_name("none|shortcuts|all")
+        ->transform(CLI::Validator(numbered, ""));
     app.add_flag("--without-accessibility", options.withoutAccessibility,
                  "Do not ask the accessibility bus: with '--keys all', passwords are recorded too");
-    app.add_option("--deny-app", options.deniedApps, "No keys, titles and rectangles of applications that match")
+    app.add_option("--deny-app", options.deniedApps,
+                   "No keys, titles and rectangles while a window is on top whose application matches this regular "
+                   "expression, regardless of case")
         ->type_name("PATTERN")
         ->expected(1)
         ->take_all();
@@ -102,18 +149,63 @@ std::optional<Options> optionsOf(int argc, char** argv) {
         ->type_name("PATTERN")
         ->expected(1)
         ->take_all();
-    app.add_flag("--json", options.json, "Print what was recorded as JSON");
-    app.add_option("--socket", socket, "The socket by which the recorder is controlled");
-    auto* commands = app.add_option_group("Control");
-    commands->add_flag("--pause", pause, "Pause the recorder that is running");
-    commands->add_flag("--resume", resume, "Let it go on");
-    commands->add_flag("--stop", stop, "End it, and wait until its movie is whole");
-    CLI::Option* recoverOption =
-        commands->add_option("--recover", recover, "Make a movie of what a recorder left that was killed")
-            ->type_name("FOLDER");
-    commands->require_option(0, 1);
-    app.add_flag("--delete", options.deletesFolder, "With --recover, remove the folder if the movie is whole");
-    app.add_flag("--watch-accessibility", watch)->group("");
+}
+
+/// What was given, as the recorder uses it.
+Options completed(GivenOptions& given, bool isWatcher) {
+    Options options = std::move(given.options);
+    if (isWatcher)
+        options.task = Task::WatchAccessibility;
+    else if (given.pause)
+        options.task = Task::Pause;
+    else if (given.resume)
+        options.task = Task::Resume;
+    else if (given.stop)
+        options.task = Task::Stop;
+    else if (given.recover)
+        options.task = Task::Recover;
+    options.output = given.output;
+    options.folder = given.recover.value_or("");
+    options.socket = given.socket;
+    if (!given.region.empty())
+        options.region = areaOf(given.region);
+    options.duration = given.duration;
+    options.sound = given.sound;
+    options.video.hasSound = options.sound.has_value();
+    requireSense(options, given);
+    return options;
+}
+
+} // namespace
+
+const char* const s_aboutRecording =
+    "Record the screen of an X display: the picture, and as metadata the cursor, clicks, the wheel, keys, windows and "
+    "the machine. Everything lies in the folder OUT.mp4.recording until OUT.mp4 is whole. Ctrl-C ends a recording";
+
+const char* const s_recordingExamples = "zulm record -o Talk.mp4                      # until Ctrl-C\n"
+                                        "zulm record -o Talk.mp4 --keys all --duration 60\n"
+                                        "zulm record --stop                           # the one that is running\n"
+                                        "zulm record --recover Talk.mp4.recording     # after the recorder was killed";
+
+void addRecordingOptions(CLI::App& app, GivenOptions& given) {
+    app.add_option("-o,--output", given.output, "The movie to make; it must not exist")->type_name("OUT");
+    addMovie(app, given);
+    addPlace(app, given);
+    addPrivacy(app, given.options);
+    app.add_flag("--json", given.options.json, "Print what was recorded as JSON");
+    addControl(app, given);
+}
+
+std::optional<Options> optionsOf(int argc, char** argv) {
+    CLI::App app(std::string(s_aboutRecording) + ".");
+    app.name("zulm record");
+    app.footer(std::string("Examples:\n") + s_recordingExamples);
+    app.formatter(std::make_shared<HelpPage>());
+    app.set_version_flag("--version", ZULM_VERSION);
+    GivenOptions given;
+    addRecordingOptions(app, given);
+    bool isWatcher = false;
+    app.add_flag("--watch-accessibility", isWatcher)->group("");
     try {
         app.parse(argc, argv);
     } catch (const CLI::Success& shown) {
@@ -122,28 +214,7 @@ std::optional<Options> optionsOf(int argc, char** argv) {
     } catch (const CLI::ParseError& error) {
         throw Refusal(fmt::format("{}\n'zulm record --help' shows what can be given", error.what()));
     }
-    if (watch)
-        options.task = Task::WatchAccessibility;
-    else if (pause)
-        options.task = Task::Pause;
-    else if (resume)
-        options.task = Task::Resume;
-    else if (stop)
-        options.task = Task::Stop;
-    else if (recoverOption->count() > 0)
-        options.task = Task::Recover;
-    options.output = output;
-    options.folder = recover;
-    options.socket = socket;
-    if (!region.empty())
-        options.region = areaOf(region);
-    if (durationOption->count() > 0)
-        options.duration = duration;
-    if (soundOption->count() > 0)
-        options.sound = sound;
-    options.video.hasSound = options.sound.has_value();
-    requireSense(options, recoverOption->count() > 0);
-    return options;
+    return completed(given, isWatcher);
 }
 
 } // namespace Recorder

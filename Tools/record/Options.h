@@ -9,6 +9,10 @@
 #include <string>
 #include <vector>
 
+namespace CLI {
+class App;
+}
+
 namespace Recorder {
 
 enum class Task { Record, Recover, Pause, Resume, Stop, WatchAccessibility };
@@ -37,6 +41,26 @@ struct Options {
     std::filesystem::path socket; ///< empty for the usual place
     bool json = false;
 };
+
+/// The words of the command line as they were given.
+struct GivenOptions {
+    Options options;
+    std::string output;
+    std::string region;
+    std::string socket;
+    std::optional<double> duration;
+    std::optional<std::string> sound;
+    std::optional<std::string> recover;
+    bool pause = false;
+    bool resume = false;
+    bool stop = false;
+};
+
+extern const char* const s_aboutRecording;
+extern const char* const s_recordingExamples; ///< command lines
+
+/// Describes the options. `zulm` uses the description for its manual, and the recorder reads its command line with it.
+void addRecordingOptions(CLI::App& app, GivenOptions& given);
 
 /// Reads the command line. Returns nothing if all that was asked for has been printed, such as the help. Throws
 /// `Refusal`.

@@ -1,7 +1,6 @@
 #include "Tools/record/PointerObserver.h"
 
 #include <algorithm>
-#include <cmath>
 
 namespace Recorder {
 
@@ -9,7 +8,6 @@ using namespace ZULMetaData;
 
 namespace {
 
-constexpr double s_notch = 120;
 /// A position that held longer is written again before it changes.
 constexpr Instant s_rest = 20 * s_millisecond;
 
@@ -82,7 +80,6 @@ void PointerObserver::button(const xcb_input_raw_button_press_event_t& event, bo
         return;
     const std::uint32_t number =
         event.detail <= buttonMap_.size() ? buttonMap_[event.detail - 1] : event.detail; // others are not mapped
-    constexpr std::int32_t notch = 120;
     switch (number) {
     case 1: input_.addButton(instant, storedButtonAction(MouseButton::Left, isPress, modifiers), isPress); break;
     case 2: input_.addButton(instant, storedButtonAction(MouseButton::Middle, isPress, modifiers), isPress); break;
@@ -91,9 +88,9 @@ void PointerObserver::button(const xcb_input_raw_button_press_event_t& event, bo
         if (!isPress || isEmulated(event.flags))
             break;
         if (number == 4 || number == 5)
-            noteScroll(instant, 0, number == 4 ? notch : -notch);
+            noteScroll(instant, 0, number == 4 ? s_notch : -s_notch);
         else if (number == 6 || number == 7)
-            noteScroll(instant, number == 6 ? notch : -notch, 0);
+            noteScroll(instant, number == 6 ? s_notch : -s_notch, 0);
     }
 }
 
@@ -101,7 +98,7 @@ void PointerObserver::noteScroll(Instant instant, std::int32_t x, std::int32_t y
     journal_.note<ScrollActionKind>(instant, Point(x, y));
 }
 
-std::vector<PointerObserver::ScrollAxis>& PointerObserver::axesOf(std::uint16_t device) {
+std::vector<ScrollAxis>& PointerObserver::axesOf(std::uint16_t device) {
     const auto known = axes_.find(device);
     if (known != axes_.end())
         return known->second;
@@ -138,11 +135,7 @@ void PointerObserver::scrollBy(const xcb_input_raw_motion_event_t& event) {
         for (ScrollAxis& axis : axes) {
             if (axis.number != number)
                 continue;
-            const double whole = axis.rest - value / axis.increment * s_notch;
-            const double written = std::trunc(whole);
-            axis.rest = whole - written;
-            const auto units = static_cast<std::int32_t>(written);
-            if (units != 0)
+            if (const std::int32_t units = axis.turned(value); units != 0)
                 noteScroll(clock_.instantOf(event.time), axis.isVertical ? 0 : units, axis.isVertical ? units : 0);
         }
     }

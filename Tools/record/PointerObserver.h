@@ -2,6 +2,7 @@
 
 #include "Tools/record/HeldInput.h"
 #include "Tools/record/Journal.h"
+#include "Tools/record/ScrollAxis.h"
 #include "Tools/record/ServerClock.h"
 #include "Tools/record/XConnection.h"
 
@@ -36,14 +37,6 @@ public:
     std::optional<Position> position() const { return position_; }
 
 private:
-    /// An axis by which a device scrolls.
-    struct ScrollAxis {
-        std::uint16_t number;
-        bool isVertical;
-        double increment; ///< of one notch; positive is down or right
-        double rest = 0;  ///< parts of a unit that were not written yet
-    };
-
     std::vector<ScrollAxis>& axesOf(std::uint16_t device);
     void note(Instant instant, Instant asked, Position position);
     void scrollBy(const xcb_input_raw_motion_event_t& event);

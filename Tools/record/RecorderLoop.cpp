@@ -24,6 +24,8 @@ namespace {
 
 constexpr Instant s_longestWait = 20 * s_millisecond;
 constexpr Instant s_diskInterval = 100 * s_millisecond;
+constexpr Instant s_askInterval = 50 * s_millisecond;     ///< for the focus, as long as keys wait to be told about
+constexpr Instant s_searchInterval = 200 * s_millisecond; ///< as long as the focus is not known
 constexpr Instant s_statusInterval = s_second / 2;
 constexpr Instant s_busDeadline = 2 * s_second;
 constexpr std::uint64_t s_mebibyte = std::uint64_t{1} << 20;
@@ -299,6 +301,7 @@ void RecorderLoop::takeMail() {
 void RecorderLoop::began(Instant zero) {
     zero_ = zero;
     journal_->start(zero);
+    disk_ = std::make_unique<DiskSync>(folder_.folder());
     journal_->note<CursorActionKind>(zero, s_noButtonYet);
     if (options_.duration)
         camera_->stopAt(endOfDuration());
@@ -314,10 +317,11 @@ void RecorderLoop::hover() {
     const std::optional<Position> pointer = observers_->pointer.position();
     if (!pointer || pointer == hovered_)
         return;
+    const bool asks = accessibility_ && observers_->windows.process() != 0;
+    if (asks && !accessibility_->askHover(*pointer))
+        return; // until the earlier question is answered, even if the pointer rests from now on
     hovered_ = pointer;
-    if (accessibility_ && observers_->windows.process() != 0)
-        accessibility_->askHover(*pointer);
-    else
+    if (!asks)
         observers_->windows.hover(now(), *pointer);
 }
 
@@ -327,7 +331,7 @@ void RecorderLoop::windowChanged(Instant instant, std::uint32_t process) {
     if (!accessibility_)
         return;
     accessibility_->windowChanged(process);
-    accessibility_->ask();
+    accessibility_->ask(0);
 }
 
 void RecorderLoop::takeFocus() {
@@ -354,8 +358,10 @@ void RecorderLoop::takeFocus() {
         accessibility_.reset();
         return;
     }
-    if (input_->hasKeys() || privacy_.isFocusUnknown())
-        accessibility_->ask();
+    if (input_->hasKeys())
+        accessibility_->ask(s_askInterval);
+    else if (privacy_.isFocusUnknown())
+        accessibility_->ask(s_searchInterval);
 }
 
 void RecorderLoop::takeSignals() {
@@ -363,6 +369,8 @@ void RecorderLoop::takeSignals() {
         if (signal->number == SIGUSR1) {
             obey(pausedAt_ ? Command::Resume : Command::Pause);
         } else {
+            if (end_ == End::Signal)
+                StopSignals::endAtOnce(signal->number, folder_.folder());
             const Instant instant = now();
             if (signal->isFromTerminal)
                 input_->dropInterruptKey();
@@ -488,6 +496,7 @@ bool RecorderLoop::save() {
         }
     };
     sound_.reset();
+    disk_.reset();
     attempt([this] { camera_->finish(endInstant_); });
     takeMail();
     input_->releaseAll(endInstant_);

@@ -7,6 +7,7 @@
 #include "Tools/record/CaptureTarget.h"
 #include "Tools/record/ControlSocket.h"
 #include "Tools/record/CursorObserver.h"
+#include "Tools/record/DiskSync.h"
 #include "Tools/record/HeldInput.h"
 #include "Tools/record/Journal.h"
 #include "Tools/record/KeyObserver.h"
@@ -90,6 +91,7 @@ private:
     std::unique_ptr<HeldInput> input_;
     std::unique_ptr<Observers> observers_;
     std::unique_ptr<Camera> camera_;
+    std::unique_ptr<DiskSync> disk_;
     std::unique_ptr<SoundSource> sound_; ///< of which nothing is there without --audio
 
     std::optional<End> end_;

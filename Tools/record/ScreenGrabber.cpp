@@ -8,6 +8,9 @@
 #include <sys/ipc.h>
 #include <sys/shm.h>
 
+#include <algorithm>
+#include <cstring>
+
 namespace Recorder {
 
 namespace {
@@ -68,8 +71,13 @@ void ScreenGrabber::findLayout() {
         throw Refusal(fmt::format("the X display has pixels of depth {}, which cannot be recorded; use one of depth 24",
                                   screen.root_depth));
     layout_ = *layout;
-    const int pad = format->scanline_pad;
-    bytesPerLine_ = (area_.width * format->bits_per_pixel + pad - 1) / pad * pad / 8;
+    bitsPerPixel_ = format->bits_per_pixel;
+    padOfLines_ = format->scanline_pad;
+    bytesPerLine_ = bytesPerLineOf(area_.width);
+}
+
+int ScreenGrabber::bytesPerLineOf(int width) const {
+    return (width * bitsPerPixel_ + padOfLines_ - 1) / padOfLines_ * padOfLines_ / 8;
 }
 
 /// A server on another machine, or in another container, cannot share memory: pictures then come as replies.
@@ -127,38 +135,54 @@ bool ScreenGrabber::notePointer(xcb_query_pointer_cookie_t cookie, GrabbedPictur
     return picture.hasPointer;
 }
 
-std::optional<GrabbedPicture> ScreenGrabber::grab() {
+/// Returns null if the server cannot tell the pixels.
+const std::uint8_t* ScreenGrabber::fetch(xcb_drawable_t source, const Area& part) {
     xcb_connection_t* connection = connection_.get();
-    const xcb_drawable_t source = drawable();
-    if (source == XCB_NONE)
-        return std::nullopt;
-    const bool isRoot = source == connection_.root();
-    const auto x = static_cast<std::int16_t>(isRoot ? area_.x : 0);
-    const auto y = static_cast<std::int16_t>(isRoot ? area_.y : 0);
-    const auto width = static_cast<std::uint16_t>(area_.width);
-    const auto height = static_cast<std::uint16_t>(area_.height);
-    GrabbedPicture picture;
-    picture.bytesPerLine = bytesPerLine_;
-    const Instant asked = now();
-    picture.pointerInstant = asked;
-    const auto pointerCookie = xcb_query_pointer(connection, connection_.root());
+    const auto x = static_cast<std::int16_t>(part.x);
+    const auto y = static_cast<std::int16_t>(part.y);
+    const auto width = static_cast<std::uint16_t>(part.width);
+    const auto height = static_cast<std::uint16_t>(part.height);
     if (segment_ != 0) {
         const auto cookie = xcb_shm_get_image(connection, source, x, y, width, height, s_allPlanes,
                                               XCB_IMAGE_FORMAT_Z_PIXMAP, segment_, 0);
         const Reply<xcb_shm_get_image_reply_t> reply(xcb_shm_get_image_reply(connection, cookie, nullptr));
-        picture.pixels = reply ? static_cast<const std::uint8_t*>(memory_) : nullptr;
-    } else {
-        const auto cookie =
-            xcb_get_image(connection, XCB_IMAGE_FORMAT_Z_PIXMAP, source, x, y, width, height, s_allPlanes);
-        image_.reset(xcb_get_image_reply(connection, cookie, nullptr));
-        const auto needed = static_cast<std::int64_t>(bytesPerLine_) * area_.height;
-        const bool isWhole = image_ && xcb_get_image_data_length(image_.get()) >= needed;
-        picture.pixels = isWhole ? xcb_get_image_data(image_.get()) : nullptr;
+        return reply ? static_cast<const std::uint8_t*>(memory_) : nullptr;
     }
+    const auto cookie = xcb_get_image(connection, XCB_IMAGE_FORMAT_Z_PIXMAP, source, x, y, width, height, s_allPlanes);
+    image_.reset(xcb_get_image_reply(connection, cookie, nullptr));
+    const auto needed = static_cast<std::int64_t>(bytesPerLineOf(part.width)) * part.height;
+    const bool isWhole = image_ && xcb_get_image_data_length(image_.get()) >= needed;
+    return isWhole ? xcb_get_image_data(image_.get()) : nullptr;
+}
+
+const std::uint8_t* ScreenGrabber::padded(const std::uint8_t* pixels, const Area& part) {
+    const auto line = static_cast<std::size_t>(bytesPerLine_);
+    const auto shorter = static_cast<std::size_t>(bytesPerLineOf(part.width));
+    padded_.assign(line * static_cast<std::size_t>(area_.height), 0);
+    for (std::size_t row = 0; row < static_cast<std::size_t>(part.height); ++row)
+        std::memcpy(&padded_[row * line], pixels + row * shorter, shorter);
+    return padded_.data();
+}
+
+std::optional<GrabbedPicture> ScreenGrabber::grab() {
+    const xcb_drawable_t source = drawable();
+    if (source == XCB_NONE)
+        return std::nullopt;
+    Area part = area_;
+    if (source != connection_.root())
+        part = {0, 0, std::min(area_.width, pixmapArea_.width), std::min(area_.height, pixmapArea_.height)};
+    GrabbedPicture picture;
+    picture.bytesPerLine = bytesPerLine_;
+    const Instant asked = now();
+    picture.pointerInstant = asked;
+    const auto pointerCookie = xcb_query_pointer(connection_.get(), connection_.root());
+    picture.pixels = fetch(source, part);
     picture.instant = middleOf(asked, now());
     notePointer(pointerCookie, picture);
     if (!picture.pixels)
         return std::nullopt;
+    if (part.width < area_.width || part.height < area_.height)
+        picture.pixels = padded(picture.pixels, part);
     return picture;
 }
 

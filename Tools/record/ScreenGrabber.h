@@ -11,6 +11,7 @@
 #include <cstddef>
 #include <cstdint>
 #include <optional>
+#include <vector>
 
 namespace Recorder {
 
@@ -39,7 +40,8 @@ public:
     PixelLayout layout() const { return layout_; }
     bool usesSharedMemory() const { return segment_ != 0; }
 
-    /// Takes a picture. Returns nothing if the area cannot be read now, such as a window that is hidden.
+    /// Takes a picture. Returns nothing if the area cannot be read now, such as a window that is hidden. A window that
+    /// became smaller has black at its right and below it.
     std::optional<GrabbedPicture> grab();
 
     /// Asks for the pointer alone.
@@ -51,6 +53,9 @@ private:
     void findLayout();
     void shareMemory();
     xcb_drawable_t drawable();
+    int bytesPerLineOf(int width) const;
+    const std::uint8_t* fetch(xcb_drawable_t source, const Area& part);
+    const std::uint8_t* padded(const std::uint8_t* pixels, const Area& part);
     bool notePointer(xcb_query_pointer_cookie_t cookie, GrabbedPicture& picture);
 
     XConnection connection_;
@@ -59,10 +64,13 @@ private:
     xcb_pixmap_t pixmap_ = 0; ///< what the window shows, even where others cover it
     Area pixmapArea_;
     PixelLayout layout_ = PixelLayout::BGRX32;
+    int bitsPerPixel_ = 0;
+    int padOfLines_ = 0; ///< bits
     int bytesPerLine_ = 0;
     xcb_shm_seg_t segment_ = 0;
     void* memory_ = nullptr;
     Reply<xcb_get_image_reply_t> image_; ///< without shared memory
+    std::vector<std::uint8_t> padded_;   ///< a window that became smaller, and black around it
 };
 
 } // namespace Recorder

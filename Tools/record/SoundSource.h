@@ -6,13 +6,12 @@
 #include "Tools/record/VideoWriter.h"
 
 #include <atomic>
+#include <cstdint>
 #include <functional>
 #include <memory>
+#include <span>
 #include <string>
 #include <thread>
-#include <vector>
-
-struct pa_simple;
 
 namespace Recorder {
 
@@ -31,16 +30,15 @@ public:
     void stop();
 
 private:
-    struct Closer {
-        void operator()(pa_simple* stream) const;
-    };
+    struct Stream; ///< from the sound server
 
     void record(const Camera& camera, VideoWriter& writer);
-    void write(VideoWriter& writer, Instant inMovie);
+    void write(VideoWriter& writer, std::span<const float> block, Instant inMovie);
+    void writeSilence(VideoWriter& writer, std::int64_t samples);
 
-    std::unique_ptr<pa_simple, Closer> stream_;
-    std::vector<float> block_;
+    std::unique_ptr<Stream> stream_;
     std::int64_t written_ = 0; ///< samples of each channel
+    double missing_ = 0;       ///< samples that are missing at the present time, smoothed; fewer than 0 are too many
     std::atomic<bool> isOver_ = false;
     std::thread thread_;
 };

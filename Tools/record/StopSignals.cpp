@@ -20,7 +20,8 @@ sigset_t stopSet() {
     return set;
 }
 
-void endAtOnce(int number) {
+/// Called while the process is interrupted, so nothing may be allocated.
+[[noreturn]] void endNow(int number) {
     constexpr int signalled = 128;
     [[maybe_unused]] const auto written = ::write(STDERR_FILENO, s_lastWords.data(), s_lastWords.size());
     _exit(signalled + number);
@@ -43,10 +44,15 @@ std::optional<StopSignals::Signal> StopSignals::next() {
     return Signal{static_cast<int>(info.ssi_signo), info.ssi_code == SI_KERNEL};
 }
 
+void StopSignals::endAtOnce(int number, const std::filesystem::path& folder) {
+    s_lastWords = folder.string() + "\n";
+    endNow(number);
+}
+
 void StopSignals::endAtNext(const std::filesystem::path& folder) {
     s_lastWords = folder.string() + "\n";
     struct sigaction action {};
-    action.sa_handler = endAtOnce;
+    action.sa_handler = endNow;
     for (const int number : {SIGINT, SIGTERM, SIGHUP})
         sigaction(number, &action, nullptr);
     std::signal(SIGUSR1, SIG_IGN);

@@ -22,6 +22,9 @@ public:
     /// Returns the next signal that has arrived.
     std::optional<Signal> next();
 
+    /// Ends the process, and the name of the folder is the last that it says.
+    [[noreturn]] static void endAtOnce(int number, const std::filesystem::path& folder);
+
     /// From now on a signal ends the process at once, and the name of the folder is the last that it says.
     void endAtNext(const std::filesystem::path& folder);
 

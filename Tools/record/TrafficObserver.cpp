@@ -39,13 +39,22 @@ struct TrafficObserver::State {
     int fixes = 0; ///< number of the extension's requests
     std::bitset<s_keys> down;
     std::map<XID, int> hides; ///< how often each client has hidden the cursor
+    bool isBroken = false;    ///< the display is gone
 
     bool open(const std::string& display);
+    void survive(Display* connection);
     void take(const XRecordInterceptData& intercepted);
     void takeKey(const xEvent& event);
     void takeRequest(const XRecordInterceptData& intercepted);
     void tellHidden(Time time);
 };
+
+/// Xlib would end the program when the display goes away, though there is a recording to save.
+void TrafficObserver::State::survive(Display* connection) {
+    const auto note = [](Display*, void* self) { static_cast<State*>(self)->isBroken = true; };
+    XSetIOErrorHandler([](Display*) { return 0; }); // which would say so
+    XSetIOErrorExitHandler(connection, note, this);
+}
 
 bool TrafficObserver::State::open(const std::string& display) {
     const char* name = display.empty() ? nullptr : display.c_str();
@@ -53,6 +62,9 @@ bool TrafficObserver::State::open(const std::string& display) {
     data.reset(XOpenDisplay(name));
     int major = 0;
     int minor = 0;
+    for (const DisplayPointer* one : {&control, &data})
+        if (*one)
+            survive(one->get());
     if (!control || !data || !XRecordQueryVersion(control.get(), &major, &minor))
         return false;
     int firstEvent = 0;
@@ -115,6 +127,8 @@ TrafficObserver::TrafficObserver(const std::string& display, Events events) : st
 }
 
 TrafficObserver::~TrafficObserver() {
+    if (state_->isBroken)
+        return;
     if (state_->data)
         XRecordDisableContext(state_->control.get(), state_->context);
     if (state_->control)
@@ -122,11 +136,11 @@ TrafficObserver::~TrafficObserver() {
 }
 
 int TrafficObserver::descriptor() const {
-    return state_->data ? ConnectionNumber(state_->data.get()) : -1;
+    return state_->data && !state_->isBroken ? ConnectionNumber(state_->data.get()) : -1;
 }
 
 void TrafficObserver::serve() {
-    if (state_->data)
+    if (state_->data && !state_->isBroken)
         XRecordProcessReplies(state_->data.get());
 }
 

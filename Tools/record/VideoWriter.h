@@ -43,7 +43,7 @@ using FramePointer = std::unique_ptr<AVFrame, FrameDeleter>;
 inline constexpr int s_pictureTimescale = 90'000;
 inline constexpr int s_soundRate = 48'000; ///< samples a second
 inline constexpr int s_soundChannels = 2;  ///< left and right
-inline constexpr double s_fragmentSeconds = 0.25;
+inline constexpr double s_fragmentSeconds = 0.1;
 
 /// Writes the movie. One thread writes pictures, another one may write sound.
 class VideoWriter {

@@ -54,7 +54,7 @@ CLI::Option* addChoice(CLI::App& command, const std::string& name, Value& value,
         const auto found = std::find(names.begin(), names.end(), word);
         if (found == names.end())
             throw CLI::ValidationError(
-                name, fmt::format("{} is none of {}{}", word, fmt::join(names, ", "), suggestionFor(word, names)));
+                name, fmt::format("{} is not one of {}{}", word, fmt::join(names, ", "), suggestionFor(word, names)));
         value = values[static_cast<std::size_t>(found - names.begin())].second;
     };
     return command.add_option_function<std::string>(name, choose, description)

@@ -4,6 +4,7 @@
 #include "SharedDependencies/EndianFile.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
+#include "Tools/zulm/StandardStreams.h"
 #include "ZULMetaDataBridge/Source/FileError.h"
 
 #include <fmt/color.h>
@@ -28,8 +29,7 @@ constexpr auto s_warning = "zulm: warning:";
 /// Prints what is shown already after `lead`, which is coloured if standard error is.
 void printLine(const std::string& lead, fmt::color color, const std::string& message) {
     const std::string shownLead = useColor(stderr) ? fmt::format(fmt::emphasis::bold | fg(color), "{}", lead) : lead;
-    const std::string line = fmt::format("{} {}\n", shownLead, message);
-    std::fwrite(line.data(), 1, line.size(), stderr); // nobody can be told where even this fails
+    writeError(fmt::format("{} {}\n", shownLead, message));
 }
 
 } // namespace

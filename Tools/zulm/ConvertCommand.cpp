@@ -181,7 +181,7 @@ void addConvertCommand(CLI::App& app, Action& chosen) {
     addSeconds(*command, "--pause", options->pause,
                "Begin a new caption after a pause of this length; the default is 1 second");
     command->add_flag("--show-keys", options->captions.showsKeys, "Show what was typed, passwords included");
-    command->add_flag("--force", options->force, "Replace OUT where it exists");
+    command->add_flag("--force", options->force, "Replace OUT if it exists");
     command->footer("zulm convert --to srt Recording.mp4 -o Recording.srt\n"
                     "zulm convert --to ffmetadata Recording.mp4 | ffmpeg -i Recording.mp4 -i - -map_metadata 1 -c copy "
                     "Chapters.mp4");

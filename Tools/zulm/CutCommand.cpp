@@ -72,7 +72,7 @@ EditList madeMovie(const CutOptions& options, const InputFile& input, const Edit
 
 ExitCode cutRecording(const CutOptions& options, RunReport& report) {
     const InputFile input(options.recording);
-    const Recording recording = openSession(input);
+    const Recording recording = input.openSession();
     if (recording.container() == Container::RawStream)
         throw Failure(fmt::format("{}: is a stream alone, without a movie that could be cut", options.recording));
     const EditList edits = editsOf(options.edits, recording);
@@ -112,7 +112,7 @@ void addCutCommand(CLI::App& app, Action& chosen) {
     command->add_option("-o,--output", options->output, "Write the new movie to this file")
         ->type_name("OUT")
         ->required();
-    command->add_flag("--force", options->force, "Replace OUT where it exists");
+    command->add_flag("--force", options->force, "Replace OUT if it exists");
     command->add_flag_callback(
         "--fast", [options] { options->mode = CutMode::Fast; },
         "Copy the pictures instead of encoding them again. Every piece then begins at the last key frame before it; "
@@ -121,7 +121,7 @@ void addCutCommand(CLI::App& app, Action& chosen) {
     command->footer("zulm cut Recording.mp4 --keep 10-25 --keep 40-1:30@2 -o Cut.mp4\n"
                     "zulm cut Recording.mp4 --remove 5-12.5 --fast -o Cut.mp4");
     command->callback([options, &chosen] {
-        requireEdits(options->edits);
+        requireEdits(options->edits, options->recording);
         chosen = reporting("cut", options->json, {options->recording, options->output, options->edits.file},
                            [options](RunReport& report) { return cutOrEnd(*options, report); });
     });

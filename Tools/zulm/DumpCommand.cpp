@@ -6,6 +6,7 @@
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/FileAccess.h"
 #include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/ManyFiles.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Printout.h"
 #include "Tools/zulm/Progress.h"
@@ -27,7 +28,7 @@ using Json = nlohmann::ordered_json;
 namespace {
 
 struct DumpOptions {
-    std::vector<std::string> files;
+    ManyFiles files;
     std::vector<std::string> kinds;
     EntryFormat format = EntryFormat::Text;
     std::optional<double> from;
@@ -149,7 +150,9 @@ StreamsToDump streamsToDump(const std::vector<StreamInfo>& available, const Dump
     return chosen;
 }
 
-ExitCode dumpFile(const std::string& path, const DumpOptions& options, Printout& printout) {
+ExitCode dumpFile(const std::string& path, const DumpOptions& options, RunReport& report) {
+    Printout printout(options.format, options.columns, options.files.areSeveral(),
+                      report.isWanted() ? &report.writer() : nullptr);
     const InputFile input(path);
     RecordingFile recording = input.open();
     const std::vector<StreamInfo> available = recording.streams();
@@ -168,9 +171,8 @@ ExitCode dumpFile(const std::string& path, const DumpOptions& options, Printout&
 ExitCode dump(const DumpOptions& options, RunReport& report) {
     if (!options.imageFolder.empty())
         createFolder(options.imageFolder);
-    Printout printout(options.format, options.columns, options.files.size() > 1,
-                      report.isWanted() ? &report.writer() : nullptr);
-    return forEachFile(options.files, [&](const std::string& path) { return dumpFile(path, options, printout); });
+    return workOnFiles(options.files, report,
+                       [&options](const std::string& path, RunReport& part) { return dumpFile(path, options, part); });
 }
 
 } // namespace
@@ -178,7 +180,7 @@ ExitCode dump(const DumpOptions& options, RunReport& report) {
 void addDumpCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<DumpOptions>();
     CLI::App* command = app.add_subcommand("dump", "Print the entries of the streams of one or several files");
-    command->add_option("FILE", options->files, "Movies, RIFF files or stream files; - is standard input")->required();
+    addManyFiles(*command, options->files, "Movies, RIFF files or stream files; - is standard input");
     addStreamOption(*command, options->kinds,
                     "Print only this kind, such as cursorLocation, or this UUID (repeatable)");
     addChoice(*command, "--format", options->format,
@@ -204,9 +206,10 @@ void addDumpCommand(CLI::App& app, Action& chosen) {
     command->callback([options, &chosen] {
         if (options->from && options->to && *options->from > *options->to)
             throw CLI::ValidationError("--from", fmt::format("{} is later than --to {}", *options->from, *options->to));
-        if (!options->imageFolder.empty() && options->files.size() > 1)
+        requireFiles(options->files);
+        if (!options->imageFolder.empty() && options->files.areSeveral())
             throw CLI::ValidationError("--images", "the images of one FILE can be written at once, not of several");
-        chosen = reporting(
+        chosen = reportingOnMany(
             "dump", options->format == EntryFormat::JSON, options->files,
             [options](RunReport& report) { return dump(*options, report); }, JsonWriter::Style::Lines);
     });

@@ -41,6 +41,16 @@ void addRanges(CLI::App& command, const std::string& name, std::vector<std::stri
         ->check(CLI::Validator(check, ""));
 }
 
+/// Returns what `read` returns. An impossible value becomes a failure that names its option.
+template <class Read>
+auto orFailure(const char* option, const std::string& text, Read read) {
+    try {
+        return read();
+    } catch (const Error& error) {
+        throw Failure(fmt::format("{} {}: {}", option, text, error.sentence()));
+    }
+}
+
 EditList readList(const EditOptions& options, const Recording& recording) {
     EditListOptions listOptions;
     listOptions.frameRate = options.frameRate;
@@ -63,7 +73,7 @@ EditList listWithout(const std::vector<std::string>& removed, const Recording& r
     std::vector<EditRange> ranges;
     ranges.reserve(removed.size());
     for (const std::string& text : removed)
-        ranges.push_back(parseEditRange(text));
+        ranges.push_back(orFailure("--remove", text, [&text] { return parseEditRange(text); }));
     return EditList::without(std::move(ranges), Rational::of(*duration));
 }
 
@@ -73,12 +83,13 @@ void addEditOptions(CLI::App& command, EditOptions& options) {
     command
         .add_option("--edits", options.file,
                     "Read the pieces from this edit list: JSON of zulm, an ffmpeg concat list, LosslessCut, "
-                    "auto-editor, OpenTimelineIO, CMX 3600, or a movie's own list")
+                    "auto-editor, OpenTimelineIO, CMX 3600, or a movie's own list; - is standard input")
         ->type_name("FILE");
-    addRanges(command, "--keep", options.kept, "A-B[@SPEED]",
-              "Keep the recording from A to B, so many times as fast (repeatable; pieces follow one another in the "
-              "order given)",
-              checkKept);
+    addRanges(
+        command, "--keep", options.kept, "A-B[@SPEED]",
+        "Keep the recording from A to B, which are seconds (12.5, 61/3) or time codes (1:30), SPEED times as fast "
+        "(repeatable; pieces follow one another in the order given)",
+        checkKept);
     addRanges(command, "--remove", options.removed, "A-B", "Keep all but what lies from A to B (repeatable)",
               checkRemoved);
     command
@@ -90,18 +101,20 @@ void addEditOptions(CLI::App& command, EditOptions& options) {
                     throw CLI::ValidationError(
                         "--frame-rate", fmt::format("'{}' is no frame rate such as 25, 29.97 or 30000/1001", word));
             },
-            "Frames for each second in an edit list that counts frames")
+            "The frame rate of an edit list that counts frames, such as 25 or 30000/1001")
         ->type_name("RATE")
         ->needs("--edits");
 }
 
-void requireEdits(const EditOptions& options) {
+void requireEdits(const EditOptions& options, const std::string& recording) {
     const int given =
         (options.file.empty() ? 0 : 1) + (options.kept.empty() ? 0 : 1) + (options.removed.empty() ? 0 : 1);
     if (given == 0)
         throw CLI::RequiredError("either --edits FILE, --keep A-B or --remove A-B");
     if (given > 1)
         throw CLI::ValidationError("--edits, --keep and --remove cannot be given together");
+    if (options.file == "-" && recording == "-")
+        throw CLI::ValidationError("only one of RECORDING and --edits can be standard input");
 }
 
 EditList editsOf(const EditOptions& options, const Recording& recording) {
@@ -111,7 +124,7 @@ EditList editsOf(const EditOptions& options, const Recording& recording) {
         return listWithout(options.removed, recording);
     EditList edits;
     for (const std::string& piece : options.kept)
-        edits.keep(piece);
+        orFailure("--keep", piece, [&] { edits.keep(piece); });
     return edits;
 }
 

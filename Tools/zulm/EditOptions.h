@@ -22,8 +22,9 @@ struct EditOptions {
 /// Adds --edits, --keep, --remove and --frame-rate.
 void addEditOptions(CLI::App& command, EditOptions& options);
 
-/// Throws the usage error unless the options say in one way which pieces are kept.
-void requireEdits(const EditOptions& options);
+/// Throws the usage error unless the options say in one way which pieces are kept, and only one of the edit list and
+/// the recording is standard input.
+void requireEdits(const EditOptions& options, const std::string& recording);
 
 /// Throws `Failure` or `ZULMetaData::Error` if the edit list cannot be read or says something impossible.
 ZULMetaData::EditList editsOf(const EditOptions& options, const ZULMetaData::Recording& recording);

@@ -12,14 +12,14 @@ class Expression;
 /// To be released. `isFixed` takes every character for itself.
 Expression* compileExpression(const char* pattern, std::size_t size, bool ignoreCase, bool isFixed);
 
-/// What is wrong with it, as long as it is not released; null where nothing is.
+/// Returns what is wrong with the expression, or null. Valid until the expression is released.
 const char* errorIn(const Expression& expression) noexcept;
 
-/// Whether it is anywhere in the text, which is UTF-8.
+/// Returns whether the expression is found anywhere in the text, which is UTF-8.
 bool isFoundIn(const char* text, std::size_t size, const Expression& expression);
 
-/// Looks for it from `start` on; what precedes `start` still counts for anchors and word boundaries. Returns false if
-/// it is not there, and otherwise where it begins and ends.
+/// Searches the text from `start` on; what precedes `start` still counts for anchors and word boundaries. Returns
+/// whether the expression was found, and sets `begin` and `end` then.
 bool findIn(const char* text, std::size_t size, std::size_t start, const Expression& expression, std::size_t& begin,
             std::size_t& end);
 

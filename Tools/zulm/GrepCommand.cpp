@@ -1,6 +1,7 @@
 #include "Reports/Text.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/ManyFiles.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
@@ -24,7 +25,7 @@ namespace {
 
 struct GrepOptions {
     std::string pattern;
-    std::vector<std::string> files;
+    ManyFiles files;
     std::vector<std::string> kinds;
     bool ignoreCase = false;
     bool isFixed = false;
@@ -145,74 +146,79 @@ ExitCode combined(ExitCode left, ExitCode right) {
     return worseOf(left, right);
 }
 
-/// Looks for the pattern in the files that are named, and in those of folders that are named.
-class FileSearch {
+void noteThatNothingMatches(const ManyFiles& files, RunReport& report) {
+    for (const std::string& file : files.named)
+        report.note(file, "no text in it matches the pattern");
+    if (!files.list.empty())
+        report.note(files.list, "no text in the files that it names matches the pattern");
+}
+
+/// The files that are named, and with --recursive the recordings in folders that are named.
+class SearchedFiles final : public FileNames {
 public:
-    FileSearch(const GrepOptions& options, RunReport& report)
-        : options_(options), pattern_(options.pattern, options.ignoreCase, options.isFixed), report_(report) {}
+    explicit SearchedFiles(const GrepOptions& options) : FileNames(options.files), recurses_(options.recurses) {}
 
-    void searchNamed(const std::string& path) {
-        std::error_code ignored;
-        if (options_.recurses && std::filesystem::is_directory(path, ignored))
-            searchFolder(path);
-        else
-            search(path);
+    bool next(FileToDo& file) override {
+        while (!found_.empty() || FileNames::next(named_)) {
+            if (found_.empty())
+                found_.push_back(named_.path);
+            const std::string path = std::move(found_.back());
+            found_.pop_back();
+            file = named_;
+            file.path = path;
+            std::error_code isNoFolder;
+            if (!recurses_ || !std::filesystem::is_directory(path, isNoFolder))
+                return true;
+            file.failure = failureToOpen(path);
+            if (file.failure)
+                return true;
+        }
+        return false;
     }
-
-    ExitCode code() const { return code_; }
-
-    /// A file in which something was found is all that a quiet search looks for.
-    bool isDone() const { return settings().quiet && !options_.json && hasFound_; }
 
 private:
-    void search(const std::string& path) {
-        const ExitCode found = forEachFile(
-            {path}, [&](const std::string& file) { return Search(options_, pattern_, file, report_).run(); });
-        hasFound_ |= found == ExitFine;
-        code_ = combined(code_, found);
-    }
-
-    /// Symbolic links are not followed, since they could lead in a circle.
-    void searchFolder(const std::string& folder) {
-        const ExitCode read = forEachFile({folder}, [&](const std::string& path) {
-            std::vector<std::filesystem::directory_entry> entries{std::filesystem::directory_iterator(path), {}};
-            std::sort(entries.begin(), entries.end());
+    /// Adds what is in a folder. Symbolic links are not followed, since they could lead in a circle.
+    std::exception_ptr failureToOpen(const std::string& folder) {
+        try {
+            std::vector<std::filesystem::directory_entry> entries{std::filesystem::directory_iterator(folder), {}};
+            std::sort(entries.rbegin(), entries.rend());
             for (const auto& entry : entries)
-                if (!isDone())
-                    searchEntry(entry);
-            return ExitNoMetaData;
-        });
-        code_ = combined(code_, read);
+                if (isSearched(entry))
+                    found_.push_back(entry.path().string());
+        } catch (const std::filesystem::filesystem_error&) {
+            return std::current_exception();
+        }
+        return nullptr;
     }
 
-    void searchEntry(const std::filesystem::directory_entry& entry) {
-        const std::string path = entry.path().string();
+    static bool isSearched(const std::filesystem::directory_entry& entry) {
         if (entry.is_symlink())
-            return;
-        if (entry.is_directory())
-            searchFolder(path);
-        else if (entry.is_regular_file() && MetaDataParser::streamTypeOf(path) != Container::Unknown)
-            search(path);
+            return false;
+        return entry.is_directory() ||
+               (entry.is_regular_file() && MetaDataParser::streamTypeOf(entry.path().string()) != Container::Unknown);
     }
 
-    const GrepOptions& options_;
-    const TextPattern pattern_;
-    RunReport& report_;
-    ExitCode code_ = ExitNoMetaData;
-    bool hasFound_ = false;
+    bool recurses_;
+    FileToDo named_;
+    std::vector<std::string> found_; ///< the next one last
 };
 
 ExitCode grep(const GrepOptions& options, RunReport& report) {
-    FileSearch search(options, report);
-    for (const std::string& file : options.files)
-        if (!search.isDone())
-            search.searchNamed(file);
-    if (search.isDone())
+    const TextPattern pattern(options.pattern, options.ignoreCase, options.isFixed);
+    const bool endsAtFirst = settings().quiet && !options.json;
+    bool hasFound = false;
+    SearchedFiles names(options);
+    const FileWork search{
+        .run = [&](const std::string& file, RunReport& part) { return Search(options, pattern, file, part).run(); },
+        .combine = combined,
+        .begin = ExitNoMetaData,
+        .isEnough = [&](ExitCode code) { return (hasFound |= code == ExitFine) && endsAtFirst; }};
+    const ExitCode code = workOnFiles(names, options.files.jobs, report, search);
+    if (hasFound && endsAtFirst)
         return ExitFine;
-    if (search.code() == ExitNoMetaData)
-        for (const std::string& file : options.files)
-            report.note(file, "no text in it matches the pattern");
-    return search.code();
+    if (code == ExitNoMetaData)
+        noteThatNothingMatches(options.files, report);
+    return code;
 }
 
 } // namespace
@@ -223,10 +229,8 @@ void addGrepCommand(CLI::App& app, Action& chosen) {
         "grep", "Search titles, slides, comments, application names and system data of many recordings. Ends with 0 if "
                 "something matches, with 4 if nothing does, and with 1 if a file could not be read");
     command->add_option("PATTERN", options->pattern, "A regular expression, as RE2 has them")->required();
-    command
-        ->add_option("FILE", options->files,
-                     "Movies, RIFF files or stream files, with --recursive also folders; - is standard input")
-        ->required();
+    addManyFiles(*command, options->files,
+                 "Movies, RIFF files or stream files, with --recursive also folders; - is standard input");
     command->add_flag("-i,--ignore-case", options->ignoreCase, "Make no difference between upper and lower case");
     command->add_flag("-F,--fixed-strings", options->isFixed, "Take PATTERN for a text instead of an expression");
     addStreamOption(*command, options->kinds, "Only this kind of texts, such as topmostWindowTitle (repeatable)");
@@ -250,11 +254,12 @@ void addGrepCommand(CLI::App& app, Action& chosen) {
                     "zulm grep -rl budget Recordings\n"
                     "zulm grep --stream topmostAppName '^Mail$' Recording.mp4");
     command->callback([options, &chosen] {
+        requireFiles(options->files);
         requireKinds("--stream", options->kinds, "has no text to search",
                      []<class Kind>() { return holdsTexts<Kind>; });
         const TextPattern checked(options->pattern, options->ignoreCase, options->isFixed);
-        chosen = reporting("grep", options->json, options->files,
-                           [options](RunReport& report) { return grep(*options, report); });
+        chosen = reportingOnMany("grep", options->json, options->files,
+                                 [options](RunReport& report) { return grep(*options, report); });
     });
 }
 

@@ -3,6 +3,7 @@
 #include "Reports/Text.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/ManyFiles.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/StandardStreams.h"
@@ -20,7 +21,7 @@ using namespace ZULMetaData;
 namespace {
 
 struct InfoOptions {
-    std::vector<std::string> files;
+    ManyFiles files;
     bool json = false;
 };
 
@@ -100,11 +101,16 @@ ExitCode showInfo(const std::string& path, RunReport& report) {
 void addInfoCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<InfoOptions>();
     CLI::App* command = app.add_subcommand("info", "Show which metadata streams a file holds");
-    command->add_option("FILE", options->files, "Movies, RIFF files or stream files; - is standard input")->required();
+    addManyFiles(*command, options->files, "Movies, RIFF files or stream files; - is standard input");
     command->add_flag("--json", options->json, "Print one JSON document");
-    command->footer("zulm info Recording.mp4\nzulm info --json *.mp4");
-    command->callback(
-        [options, &chosen] { chosen = reportingOnEach("info", options->json, options->files, showInfo); });
+    command->footer("zulm info Recording.mp4\nzulm info --json *.mp4\n"
+                    "find Recordings -name '*.mp4' -print0 | zulm info --json --files-from - --null --jobs 0");
+    command->callback([options, &chosen] {
+        requireFiles(options->files);
+        chosen = reportingOnMany("info", options->json, options->files, [options](RunReport& report) {
+            return workOnFiles(options->files, report, showInfo);
+        });
+    });
 }
 
 } // namespace Zulm

@@ -113,7 +113,10 @@ Manual manualOf(const CLI::App& app) {
 
 std::vector<ManualOption> globalOptions(const Manual& manual, const ManualCommand& command) {
     std::vector<ManualOption> options = manual.options;
-    std::erase_if(options, [](const ManualOption& option) { return option.names.back() == "--version"; });
+    const bool isRecorder = command.name == s_recordCommand;
+    std::erase_if(options, [isRecorder](const ManualOption& option) {
+        return isRecorder ? option.names.back() != "--help" : option.names.back() == "--version";
+    });
     for (const ManualOption& own : command.options)
         for (ManualOption& option : options)
             std::erase_if(option.names, [&](const std::string& name) {
@@ -132,11 +135,9 @@ std::vector<std::string> groupsOf(const Manual& manual) {
 
 std::string generated(const Manual& manual, const std::string& format) {
     using Render = std::string (*)(const Manual&);
-    constexpr std::pair<const char*, Render> renders[]{{"man", manPage},
-                                                       {"markdown", markdownPage},
-                                                       {"bash", bashCompletion},
-                                                       {"zsh", zshCompletion},
-                                                       {"fish", fishCompletion}};
+    constexpr std::pair<const char*, Render> renders[]{{"man", manPage},           {"man-record", recorderManPage},
+                                                       {"markdown", markdownPage}, {"bash", bashCompletion},
+                                                       {"zsh", zshCompletion},     {"fish", fishCompletion}};
     for (const auto& [name, render] : renders)
         if (format == name)
             return render(manual);

@@ -27,14 +27,31 @@ std::string roffOption(const ManualOption& option) {
     return fmt::format(".TP\n{}{}\n{}\n", names, value, roff(option.description));
 }
 
-std::string roffCommand(const ManualCommand& command) {
-    std::string text =
-        fmt::format(".SS {}\n{}.\n.PP\n.B {}\n", command.name, roff(command.description), roff(command.usage()));
-    for (const ManualOption& option : command.options)
+std::string roffOptions(const std::vector<ManualOption>& options) {
+    std::string text;
+    for (const ManualOption& option : options)
         text += roffOption(option);
-    for (const std::string& example : command.examples)
+    return text;
+}
+
+std::string roffExamples(const std::vector<std::string>& examples) {
+    std::string text;
+    for (const std::string& example : examples)
         text += fmt::format(".PP\n.EX\n{}\n.EE\n", roff(example));
     return text;
+}
+
+template <class Codes>
+std::string roffCodes(const Codes& codes) {
+    std::string text = ".SH EXIT STATUS\n";
+    for (const auto& [code, meaning] : codes)
+        text += fmt::format(".TP\n.B {}\n{}\n", code, roff(meaning));
+    return text;
+}
+
+std::string roffCommand(const ManualCommand& command) {
+    return fmt::format(".SS {}\n{}.\n.PP\n.B {}\n", command.name, roff(command.description), roff(command.usage())) +
+           roffOptions(command.options) + roffExamples(command.examples);
 }
 
 /// A '|' would divide the cell of a table.
@@ -87,19 +104,32 @@ std::string manPage(const Manual& manual) {
                        [](char c) { return c >= 'a' && c <= 'z' ? static_cast<char>(c - 32) : c; });
         page += fmt::format(".SH COMMANDS: {}\n", title) + eachCommand(manual, group, roffCommand);
     }
-    page += ".SH OPTIONS OF EVERY COMMAND\n";
-    for (const ManualOption& option : manual.options)
-        page += roffOption(option);
-    page += ".SH EXIT STATUS\n";
-    for (const auto& [code, meaning] : s_exitCodes)
-        page += fmt::format(".TP\n.B {}\n{}\n", code, roff(meaning));
+    page += ".SH OPTIONS OF EVERY COMMAND\n" + roffOptions(manual.options) + roffCodes(s_exitCodes);
     page +=
         ".SH ENVIRONMENT\n.TP\n.B NO_COLOR\nIf this is set and not empty, nothing is coloured.\n.TP\n.B TERM\nIf this "
         "is dumb, nothing is coloured.\n.TP\n.B TMPDIR\nThe folder in which standard input is kept while it is "
         "read.\n.SH EXAMPLES\n";
-    for (const std::string& example : manual.examples)
-        page += fmt::format(".PP\n.EX\n{}\n.EE\n", roff(example));
-    return page;
+    return page + roffExamples(manual.examples);
+}
+
+std::string recorderManPage(const Manual& manual) {
+    constexpr std::pair<const char*, const char*> codes[]{
+        {"0", "The recording has ended well, or what was asked for is done."},
+        {"1", "Nothing could be made."},
+        {"2", "Something was refused, and nothing was created."},
+        {"3", "The disk became full, or something else is lost. What could be saved is saved."},
+        {"128+n",
+         "A second signal, with the number n, ended the recorder at once. The folder with the recording is kept."},
+    };
+    const auto command = std::find_if(manual.commands.begin(), manual.commands.end(),
+                                      [](const ManualCommand& each) { return each.name == s_recordCommand; });
+    return fmt::format(".TH ZULM-RECORD 1 \"\" \"zulm {}\" \"User Commands\"\n.nh\n.ad l\n.SH NAME\nzulm\\-record \\- "
+                       "record the screen of an X display\n.SH SYNOPSIS\n.B {}\n.SH DESCRIPTION\n{}.\n.SH OPTIONS\n",
+                       ZULM_VERSION, roff(command->usage()), roff(command->description)) +
+           roffOptions(command->options) + roffOptions(globalOptions(manual, *command)) + roffCodes(codes) +
+           ".SH ENVIRONMENT\n.TP\n.B DISPLAY\nThe X display.\n.TP\n.B XDG_RUNTIME_DIR\nThe folder with the socket by "
+           "which the recorder is controlled.\n.SH EXAMPLES\n" +
+           roffExamples(command->examples) + ".SH SEE ALSO\n.BR zulm (1)\n";
 }
 
 std::string markdownPage(const Manual& manual) {

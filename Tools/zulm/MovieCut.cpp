@@ -126,7 +126,7 @@ private:
         add(words, mapping);
         add(words, {"-c:v", "copy", "-c:a", "aac", "-b:a", "192k", "-map_metadata", "-1"});
         if (!files_.empty() && files_.back().name.ends_with(".nut"))
-            add(words, {"-bsf:v", lastFrameFilter(), "-video_track_timescale", std::to_string(s_ticksPerSecond)});
+            add(words, {"-bsf:v", durationFilter(), "-video_track_timescale", std::to_string(s_ticksPerSecond)});
         add(words, {"-f", container(), mediaAddress(output_)});
         ffmpeg_.run(words, "put the pieces of " + name_ + " together");
     }
@@ -151,16 +151,18 @@ private:
         return path;
     }
 
-    /// Makes the last frame of encoded pictures last until the end: it would be as long as a usual one.
-    std::string lastFrameFilter() const {
+    /// Makes the last frame of encoded pictures last until the end: it would be as long as a usual one. No other frame
+    /// lasts longer than that: a movie is as long as its frames say.
+    std::string durationFilter() const {
         const auto last = mediaIn(folder_ / files_.back().name, files_.back().name).picture;
         if (!last || last->frames.empty())
             throw Failure(fmt::format("{}: ffmpeg has made no frame of its last piece; nothing was written", name_));
         const Rational end = edits_.duration();
         const Rational time = end - files_.back().piece.duration + last->secondsOf(last->frames.back());
         const Rational rounding(1, 10000);
-        return fmt::format("setts=duration='if(gte(PTS*TB,{}),max(1,round(({}-PTS*TB)/TB)),DURATION)'",
-                           numberFor(time - rounding), numberFor(end));
+        const std::string rest = fmt::format("round(({}-PTS*TB)/TB)", numberFor(end));
+        return fmt::format("setts=duration='max(1,if(gte(PTS*TB,{}),{},min(DURATION,{})))'", numberFor(time - rounding),
+                           rest, rest);
     }
 
     /// Reads the new movie: a frame must begin where a piece does.

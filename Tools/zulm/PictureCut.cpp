@@ -42,8 +42,8 @@ std::optional<Rational> timeBefore(const PictureStream& pictures, std::size_t fr
 
 // Encoding --------------------------------------------------------------------------------------------------------
 
-/// How far frames of a piece that is sped up are apart at least, so that it shows no more of them for a second than the
-/// source usually does.
+/// Returns the least distance between two frames of a piece that is sped up. With it the piece shows no more frames in
+/// a second than the source usually does.
 double leastDistanceIn(const PictureStream& pictures) {
     constexpr double most = 1.0 / 60; // seconds
     constexpr double tolerance = 0.9; // distances are rounded

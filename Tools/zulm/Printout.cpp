@@ -125,9 +125,8 @@ void Printout::beginTable() {
         about.insert(about.begin(), s_fileColumn);
     linePrefix_ = csvLine({{s_fileColumn, validText(file_)}, {s_streamColumn, kind_}}, about) + ',';
     tableKeys_ = columns_.namesIn(*keys_);
-    writeOutput(fmt::format("{}{}\n", hasTable_ ? "\n" : "",
-                            columns_.areChosen() ? csvHeader(tableKeys_) : csvHeader(about) + ',' + csvHeader(*keys_)));
-    hasTable_ = true;
+    writeSeparator("\n");
+    writeOutput((columns_.areChosen() ? csvHeader(tableKeys_) : csvHeader(about) + ',' + csvHeader(*keys_)) + '\n');
 }
 
 void Printout::print(const Json& entry) {

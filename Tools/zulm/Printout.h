@@ -64,7 +64,6 @@ private:
     const ZULMetaData::EntryKeys* keys_ = nullptr;
     ZULMetaData::EntryKeys tableKeys_;
     std::string linePrefix_; ///< of a line of csv: the fields that are not the entry's
-    bool hasTable_ = false;
     std::optional<DumpDocument> document_;
 };
 

@@ -108,7 +108,7 @@ void print(const RetimeOptions& options, const RetimedStreams& streams, const At
 
 ExitCode retimeRecording(const RetimeOptions& options, RunReport& report) {
     const InputFile input(options.recording);
-    const Recording recording = openSession(input);
+    const Recording recording = input.openSession();
     const EditList edits = editsOf(options.edits, recording);
     if (recording.streams().empty())
         return complainAboutNoStreams(recording);
@@ -142,14 +142,14 @@ void addRetimeCommand(CLI::App& app, Action& chosen) {
     command->add_option("-o,--output", options->output, "Write a copy of EDITED with the metadata to this file")
         ->type_name("OUT")
         ->required();
-    command->add_flag("--force", options->force, "Replace OUT where it exists");
+    command->add_flag("--force", options->force, "Replace OUT if it exists");
     command->add_flag("--replace", options->replace, "Leave out the metadata that EDITED has, except who made it");
     addFragmentIndexOption(*command, options->index);
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm retime Recording.mp4 --movie Cut.mp4 --keep 10-25 --keep 40-1:30@2 -o Whole.mp4\n"
                     "zulm retime Recording.mp4 --movie Cut.mp4 --edits Project.llc -o Whole.mp4");
     command->callback([options, &chosen] {
-        requireEdits(options->edits);
+        requireEdits(options->edits, options->recording);
         chosen = reporting("retime", options->json,
                            {options->recording, options->movie, options->output, options->edits.file},
                            [options](RunReport& report) { return retimeRecording(*options, report); });

@@ -2,13 +2,11 @@
 
 #include "Reports/Report.h"
 #include "Reports/Text.h"
-#include "Tools/zulm/InputFile.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/StandardStreams.h"
 #include "Tools/zulm/TemporaryFile.h"
 #include "ZULMetaDataBridge/Source/FileError.h"
-#include "ZULMetaDataBridge/Source/ReportedNames.h"
 
 #include <fmt/core.h>
 
@@ -26,17 +24,6 @@ namespace {
 constexpr double s_mostDifference = 0.1;
 
 } // namespace
-
-Recording openSession(const InputFile& input) {
-    Recording recording = input.path() == input.name()
-                              ? Recording(FileLocation(input.path()))
-                              : Recording(openSource(input.path(), input.name()), input.name());
-    const char* container = containerName(recording.container());
-    if (isNamedOtherwise(input.path(), recording.container()))
-        warn(fmt::format("{}: is a {} by its contents, whatever its name says", recording.name(), container));
-    say(fmt::format("{}: {} with {} streams", recording.name(), container, recording.streams().size()));
-    return recording;
-}
 
 ExitCode complainAboutNoStreams(const Recording& recording) {
     Zulm::complain(

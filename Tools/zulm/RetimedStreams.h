@@ -14,11 +14,7 @@
 
 namespace Zulm {
 
-class InputFile;
 class TemporaryFile;
-
-/// Opens a recording as `openRecording` does.
-ZULMetaData::Recording openSession(const InputFile& input);
 
 /// Complains that a recording has no stream. Returns how the command ends.
 ExitCode complainAboutNoStreams(const ZULMetaData::Recording& recording);

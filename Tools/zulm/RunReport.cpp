@@ -3,6 +3,8 @@
 #include "Reports/Text.h"
 #include "Tools/zulm/StandardStreams.h"
 
+#include <algorithm>
+#include <iterator>
 #include <utility>
 
 namespace Zulm {
@@ -11,20 +13,31 @@ namespace {
 
 constexpr std::size_t s_filesDepth = 2; // the document and its "files"
 
+thread_local RunReport* t_current = nullptr;
+
 } // namespace
 
-RunReport* RunReport::s_current = nullptr;
-
 RunReport::RunReport(const std::string& command, bool isWanted, std::vector<std::string> files, JsonWriter::Style style)
-    : isWanted_(isWanted), files_(std::move(files)), workedOn_(files_.empty() ? std::string() : files_.front()),
-      writer_(writeOutput, style) {
+    : before_(t_current), isWanted_(isWanted), files_(std::move(files)),
+      workedOn_(files_.empty() ? std::string() : files_.front()), writer_(writeOutput, style) {
     if (isWanted_)
         beginReport(writer_, command);
-    s_current = this;
+    t_current = this;
+}
+
+RunReport::RunReport(const RunReport& whole, const std::string& file)
+    : before_(t_current), isWanted_(whole.isWanted_), workedOn_(file),
+      writer_(whole.writer_.forElements(
+          [](std::string_view text) { PrintTarget::current()->print(Printed::Document, text); })) {
+    t_current = this;
 }
 
 RunReport::~RunReport() {
-    s_current = nullptr;
+    t_current = before_;
+}
+
+RunReport* RunReport::current() {
+    return t_current;
 }
 
 JsonWriter& RunReport::beginFile(const std::string& name) {
@@ -54,6 +67,16 @@ void RunReport::noteComplaint(const std::string& line) {
         note(workedOn_, line);
     else
         note(file, line.substr(file.size() + 2));
+}
+
+std::vector<ReportedError> RunReport::endPart() {
+    if (isWanted_)
+        writer_.endTo(s_filesDepth);
+    return std::move(errors_);
+}
+
+void RunReport::addErrors(std::vector<ReportedError> errors) {
+    std::move(errors.begin(), errors.end(), std::back_inserter(errors_));
 }
 
 void RunReport::end() {

@@ -18,6 +18,11 @@ public:
     /// the names that complaints may begin with. A complaint that begins with none of them is about the file that is
     /// being worked on, which is the first one until `workOn` says otherwise.
     RunReport(const std::string& command, bool isWanted, std::vector<std::string> files, JsonWriter::Style style);
+
+    /// The part of the report `whole` that is about one file, made by a thread that prints to a `PrintTarget`. What is
+    /// written goes there as `Printed::Document`.
+    RunReport(const RunReport& whole, const std::string& file);
+
     ~RunReport();
     RunReport(const RunReport&) = delete;
     RunReport& operator=(const RunReport&) = delete;
@@ -42,15 +47,20 @@ public:
     /// Keeps a line of standard error.
     void noteComplaint(const std::string& line);
 
+    /// Returns the errors of a part, whose element is ended.
+    std::vector<ReportedError> endPart();
+
+    /// Appends the errors of a part.
+    void addErrors(std::vector<ReportedError> errors);
+
     /// Writes the errors and the end of the document.
     void end();
 
-    /// The one that exists, or null.
-    static RunReport* current() { return s_current; }
+    /// The newest one of this thread, or null.
+    static RunReport* current();
 
 private:
-    static RunReport* s_current;
-
+    RunReport* before_;
     bool isWanted_;
     std::vector<std::string> files_;
     std::string workedOn_;

@@ -54,7 +54,7 @@ void addDestinationOptions(CLI::App& command, SaveOptions& options, const std::s
     auto* output = command.add_option("-o,--output", options.output,
                                       fmt::format("Write a changed copy of {} to this file", subject));
     output->type_name("OUT");
-    command.add_flag("--force", options.force, "Replace OUT where it exists")->needs(output);
+    command.add_flag("--force", options.force, "Replace OUT if it exists")->needs(output);
     command.add_flag("--in-place", options.inPlace, fmt::format("Change {} itself", subject))->excludes(output);
 }
 

@@ -1,5 +1,8 @@
 #include "Tools/zulm/SisterProgram.h"
 
+#include "Tools/record/Options.h"
+#include "Tools/zulm/Manual.h"
+
 #include <fmt/core.h>
 
 #include <unistd.h>
@@ -9,6 +12,7 @@
 #include <cerrno>
 #include <cstring>
 #include <filesystem>
+#include <memory>
 #include <system_error>
 
 namespace Zulm {
@@ -18,7 +22,7 @@ namespace {
 namespace fs = std::filesystem;
 
 constexpr std::array s_sisters{
-    SisterProgram{"record", "zulm-record", "record", "Record the screen of an X display ('zulm record --help')", false},
+    SisterProgram{s_recordCommand, "zulm-record", "record", "", false},
     SisterProgram{"render", "zulm-render", "render",
                   "Make a film of a recording, with its cursor drawn in ('zulm render --help')", true},
     SisterProgram{"guide", "zulm-render", "render",
@@ -73,7 +77,16 @@ ExitCode become(const SisterProgram& sister, const std::vector<std::string>& wor
 }
 
 void addRecordCommand(CLI::App& app, Action& chosen) {
-    addSister(app, chosen, "record");
+    const auto given = std::make_shared<Recorder::GivenOptions>(); // which nobody reads: the recorder does
+    CLI::App* command = app.add_subcommand(s_recordCommand, Recorder::s_aboutRecording);
+    Recorder::addRecordingOptions(*command, *given);
+    command->footer(Recorder::s_recordingExamples);
+    command->callback([given, &chosen] {
+        chosen = [] {
+            complain("'record' must be the first word, as in 'zulm record --help'");
+            return ExitUsage;
+        };
+    });
 }
 
 void addRenderCommand(CLI::App& app, Action& chosen) {

@@ -14,7 +14,7 @@ struct SisterProgram {
     std::string_view command; ///< the word after `zulm`
     const char* program;      ///< its name
     const char* folder;       ///< of its sources, and of what is built of them
-    const char* description;  ///< for the help of `zulm`
+    const char* description;  ///< for the help of `zulm`; empty if it knows the options too
     bool takesCommand;        ///< whether its first word is the command, because it has several
 };
 

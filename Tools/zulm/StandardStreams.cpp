@@ -21,6 +21,8 @@ namespace Zulm {
 namespace {
 
 std::array<char, 1 << 16> s_outputBuffer;
+bool s_hasOutput = false; // only the thread whose turn it is writes to standard output
+thread_local PrintTarget* t_target = nullptr;
 
 } // namespace
 
@@ -53,8 +55,37 @@ void complainAboutOutput(int error) {
 }
 
 void writeOutput(std::string_view bytes) {
+    if (t_target)
+        return t_target->print(Printed::Output, bytes);
+    s_hasOutput |= !bytes.empty();
     if (std::fwrite(bytes.data(), 1, bytes.size(), stdout) != bytes.size())
         throw std::system_error(errno, std::generic_category(), "standard output");
+}
+
+void writeSeparator(std::string_view bytes) {
+    if (t_target)
+        t_target->print(Printed::Separator, bytes);
+    else if (s_hasOutput)
+        writeOutput(bytes);
+}
+
+void writeError(std::string_view line) {
+    if (t_target)
+        t_target->print(Printed::Error, line);
+    else
+        std::fwrite(line.data(), 1, line.size(), stderr);
+}
+
+PrintTarget* PrintTarget::current() {
+    return t_target;
+}
+
+PrintsTo::PrintsTo(PrintTarget* target) : before_(t_target) {
+    t_target = target;
+}
+
+PrintsTo::~PrintsTo() {
+    t_target = before_;
 }
 
 std::string heading(const std::string& text) {

@@ -18,8 +18,8 @@ public:
     /// Returns whether the expression is found anywhere in `text`, which is UTF-8.
     bool matches(const std::string& text) const;
 
-    /// Returns the parts of `text` that match, from left to right, without those that are empty. A text that matches
-    /// only in the composed form gives parts of that form.
+    /// Returns the parts of `text` that match, from left to right, without those that are empty. If a text matches
+    /// only in the composed form, its parts are in that form.
     std::vector<std::string> partsOf(const std::string& text) const;
 
 private:

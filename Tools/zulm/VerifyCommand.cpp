@@ -3,6 +3,7 @@
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/ManyFiles.h"
 #include "Tools/zulm/RunReport.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
@@ -22,7 +23,7 @@ using namespace ZULMetaData;
 namespace {
 
 struct VerifyOptions {
-    std::vector<std::string> files;
+    ManyFiles files;
     std::set<FindingCode> ignored;
     bool isStrict = false;
     bool listsRules = false;
@@ -113,7 +114,7 @@ ExitCode verify(const VerifyOptions& options, const std::string& path, RunReport
 void addVerifyCommand(CLI::App& app, Action& chosen) {
     auto options = std::make_shared<VerifyOptions>();
     CLI::App* command = app.add_subcommand("verify", "Walk every byte of the metadata and say what is damaged where");
-    command->add_option("FILE", options->files, "Movies, RIFF files or stream files; - is standard input");
+    addManyFiles(*command, options->files, "Movies, RIFF files or stream files; - is standard input");
     command->add_flag("--strict", options->isStrict, "End with 3 if there are notices, too");
     command
         ->add_option_function<std::vector<std::string>>(
@@ -128,16 +129,19 @@ void addVerifyCommand(CLI::App& app, Action& chosen) {
     command->add_flag("--rules", options->listsRules, "List every rule with its severity and its meaning, and end");
     command->add_flag("--json", options->json, "Print one JSON document");
     command->footer("zulm verify Recording.mp4\nzulm verify --json *.mp4\n"
-                    "zulm verify --strict --ignore several-metadata-atoms Recording.mp4");
+                    "zulm verify --strict --ignore several-metadata-atoms Recording.mp4\n"
+                    "find Recordings -name '*.mp4' -print0 | zulm -q verify --files-from - --null --jobs 0");
     command->callback([options, &chosen] {
-        if (options->files.empty() && !options->listsRules)
-            throw CLI::RequiredError("FILE");
-        if (options->listsRules)
+        if (options->listsRules) {
             chosen = listRules;
-        else
-            chosen = reportingOnEach(
-                "verify", options->json, options->files,
-                [options](const std::string& path, RunReport& report) { return verify(*options, path, report); });
+            return;
+        }
+        requireFiles(options->files);
+        chosen = reportingOnMany("verify", options->json, options->files, [options](RunReport& report) {
+            return workOnFiles(options->files, report, [options](const std::string& path, RunReport& part) {
+                return verify(*options, path, part);
+            });
+        });
     });
 }
 

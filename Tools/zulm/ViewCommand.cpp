@@ -38,6 +38,7 @@ struct ViewOptions {
 constexpr std::uint64_t s_mostEmbedded = std::uint64_t{360} << 20;
 
 constexpr std::string_view s_elementStart = "<script type=\"application/json\" id=\"zulm-recording\">";
+constexpr std::string_view s_metaDataStart = "<script type=\"text/plain\" id=\"zulm-metadata\">";
 constexpr std::string_view s_elementEnd = "</script>\n";
 constexpr std::string_view s_place = "</head>";
 
@@ -86,16 +87,19 @@ void writeMovie(std::ofstream& stream, const std::string& movie, const std::stri
 }
 
 void writePage(OutputFile& file, const ViewOptions& options, const InputFile& input, const PageParts& page,
-               const Json& document) {
+               const ViewedRecording& recording) {
     std::ofstream stream = openOutput(file.temporaryPath(), options.output);
-    const std::string text = scriptText(document);
-    const std::size_t end = options.embed ? text.size() - std::strlen("\"}") : text.size(); // behind the address
+    const std::string text = scriptText(recording.document);
+    const std::size_t end = options.embed ? text.size() - std::strlen("\"}") : text.size(); // of the address
     write(stream, page.front());
     write(stream, s_elementStart);
     write(stream, std::string_view(text).substr(0, end));
     if (options.embed)
         writeMovie(stream, input.path(), input.name());
     write(stream, std::string_view(text).substr(end));
+    write(stream, s_elementEnd);
+    write(stream, s_metaDataStart);
+    write(stream, recording.metaData);
     write(stream, s_elementEnd);
     write(stream, page.back());
     stream.close();
@@ -104,7 +108,7 @@ void writePage(OutputFile& file, const ViewOptions& options, const InputFile& in
     file.commit();
 }
 
-/// Where the page finds the movie; null where there is none to show.
+/// Returns what the page must know to find the movie, or null if there is none to show.
 Json movieFor(const ViewOptions& options, const InputFile& input, RecordingFile& recording) {
     const bool isStream = recording.container() == Container::RawStream;
     if (isStream && options.embed)
@@ -128,7 +132,7 @@ ExitCode runView(const ViewOptions& options) {
         return complainAboutNothing(recording, {});
     const PageParts page(options);
     OutputFile file(options.output, {input.name(), options.page}, options.force);
-    writePage(file, options, input, page, viewDocument(recording, movieFor(options, input, recording)));
+    writePage(file, options, input, page, viewedRecording(recording, movieFor(options, input, recording)));
     if (!recording.validation().isDamaged())
         return ExitFine;
     complain(fmt::format("{}: is damaged, the page shows what could be read; 'zulm verify {}' says more", input.name(),

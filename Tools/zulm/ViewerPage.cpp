@@ -3,6 +3,7 @@
 #include "Reports/Findings.h"
 #include "Reports/InfoReport.h"
 #include "Reports/Text.h"
+#include "Tools/zulm/PackedBytes.h"
 #include "Tools/zulm/Substitutes.h"
 #include "ZULMetaDataBridge/Source/MetaDataExcerpt.h"
 
@@ -26,15 +27,16 @@ bool isPlainInAddress(char c) {
 
 } // namespace
 
-Json viewDocument(RecordingFile& recording, const Json& movie) {
+ViewedRecording viewedRecording(RecordingFile& recording, const Json& movie) {
     const std::string excerpt = orFileError(recording.name(), [&] { return metaDataExcerpt(recording.parser()); });
     const std::string name = std::filesystem::path(recording.name()).filename().string();
     Json info = infoDocument(recording);
     info["path"] = validText(name); // the page may go to people who need not know the folder
-    return {{"schema", "zulm.view"},        {"schema_version", 1},
-            {"tool_version", ZULM_VERSION}, {"name", validText(name)},
-            {"info", std::move(info)},      {"verify", verifyDocument(name, recording.validation())},
-            {"metadata", base64(excerpt)},  {"movie", movie}};
+    Json document{{"schema", "zulm.view"},           {"schema_version", 2},
+                  {"tool_version", ZULM_VERSION},    {"name", validText(name)},
+                  {"info", std::move(info)},         {"verify", verifyDocument(name, recording.validation())},
+                  {"metadata_size", excerpt.size()}, {"movie", movie}};
+    return {std::move(document), base64(packed(excerpt))};
 }
 
 std::string relativeAddress(const std::string& file, const std::string& folder) {

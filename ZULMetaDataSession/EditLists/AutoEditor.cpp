@@ -20,7 +20,7 @@ namespace {
 constexpr std::array s_otherActions{"nil",     "volume", "deesser", "duck",       "invert",   "brightness", "blur",
                                     "opacity", "luv",    "erosion", "aberration", "pixelate", "drawbox",    "ease"};
 
-/// Of version 3: what plays from one frame of the timeline on.
+/// A clip of version 3.
 struct TimelineClip {
     std::size_t number = 0; ///< in the file, counted from 1
     Rational start;         ///< in frames of the timeline
@@ -62,7 +62,7 @@ private:
         } else if (options_.frameRate) {
             frameRate_ = *options_.frameRate;
         } else {
-            list_.fail("it counts frames, and the frame rate is not known; name it");
+            list_.fail("it counts frames; name its frame rate");
         }
     }
 

@@ -208,8 +208,9 @@ private:
         }
     }
 
-    /// Lists state the source out of an event with motion in two ways: where the source really ends, or as far from the
-    /// source in as the record out is from the record in.
+    /// Returns how many times as fast an event plays. In lists the source out of an event with motion has one of two
+    /// meanings: the real end of the source, or a time as far from the source in as the record out is from the record
+    /// in.
     Rational speedOf(const CMXEvent& event) const {
         const Rational ratio(event.sourceLength(), event.recordLength());
         if (!event.motion) {
@@ -256,7 +257,7 @@ private:
 
 EditList readCMX3600(std::string_view text, const std::string& file, const EditListOptions& options) {
     if (!options.frameRate)
-        throw Error(file, "an edit decision list counts frames, and the frame rate is not known; name it");
+        throw Error(file, "an edit decision list counts frames; name its frame rate");
     return EventReader(file, *options.frameRate).read(text);
 }
 

@@ -1,9 +1,9 @@
 // Opens edit lists, whatever form they have.
 
 #include "ZULMetaData/Containers/ContainerRecognition.h"
-#include "ZULMetaDataBridge/Source/FileError.h"
 #include "ZULMetaDataSession/EditLists/Formats.h"
 #include "ZULMetaDataSession/EditLists/ListBuilder.h"
+#include "ZULMetaDataSession/OrError.h"
 
 #include <algorithm>
 #include <array>
@@ -146,21 +146,11 @@ EditListFormat detail::recognizedText(std::string_view text) {
 
 EditList EditList::open(const FileLocation& file, const EditListOptions& options) {
     const std::string name = utf8Path(file);
-    try {
-        return openList(ByteSource::file(name), name, options);
-    } catch (const std::system_error& error) {
-        throw Error(name, error.what());
-    }
+    return detail::orError(name, [&] { return openList(ByteSource::file(name), name, options); });
 }
 
 EditList EditList::open(const ByteSource& bytes, const std::string& name, const EditListOptions& options) {
-    try {
-        return openList(bytes, name, options);
-    } catch (const FileError& error) {
-        throw Error(error.file(), error.sentence());
-    } catch (const std::system_error& error) {
-        throw Error(name, error.what());
-    }
+    return detail::orError(name, [&] { return openList(bytes, name, options); });
 }
 
 } // namespace ZULMetaData

@@ -26,7 +26,7 @@ struct CameraOptions {
 struct CameraView {
     ScreenPoint centre; ///< the middle of `area`
     double zoom = 1;    ///< how many times larger the picture appears; at least 1
-    ScreenRect area;    ///< what is visible, in pixels of the recorded display; within the screen
+    ScreenRect area;    ///< what is visible, in units of the display; within the screen
 };
 
 /// A camera on a critically damped spring, which pulls it to each place without swinging over. Until the first click or

@@ -17,8 +17,8 @@ namespace ZULMetaData {
 /// When presses make a double click, a drag, or a click without an end.
 struct ClickOptions {
     double multipleTime = 0.5;   ///< seconds from press to press, at most, within a double or triple click
-    double multipleDistance = 5; ///< pixels from press to press, at most, within a double or triple click
-    double dragDistance = 8;     ///< pixels; a cursor that moves farther from the press before the release drags
+    double multipleDistance = 5; ///< units from press to press, at most, within a double or triple click
+    double dragDistance = 8;     ///< units; a cursor that moves farther from the press before the release drags
     double unreleased = 1;       ///< seconds that a press lasts, at most, if its release was not recorded
 };
 

@@ -21,7 +21,7 @@ namespace ZULMetaData {
 /// How much a path is smoothed: a one-euro filter that runs forward and backward.
 struct CursorPathOptions {
     double minCutoff = 1;   ///< Hz: the cutoff frequency for a cursor that hardly moves; a lower one smooths more
-    double beta = 0.007;    ///< Hz for each pixel in a second, which a moving cursor adds to the cutoff frequency
+    double beta = 0.007;    ///< Hz for each unit in a second, which a moving cursor adds to the cutoff frequency
     double speedCutoff = 1; ///< Hz: the cutoff frequency of the speed itself
     double rest = 0.2;      ///< seconds; a cursor that stays at one position this long rests there
 };
@@ -43,7 +43,7 @@ public:
 
     bool empty() const { return times_.empty(); } ///< returns true if no position is known
 
-    /// Returns where the cursor is, in pixels of the recorded display. Before the first entry that is the first
+    /// Returns where the cursor is, in units of the display. Before the first entry that is the first
     /// position, and after the last entry the last one. Empty if no position is known. Takes O(log n) time.
     std::optional<ScreenPoint> at(double time) const;
 

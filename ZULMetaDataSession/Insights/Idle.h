@@ -1,6 +1,6 @@
 #pragma once
 
-// When the person in front of the machine did nothing.
+// When the person at the machine did nothing.
 //
 //     for (const IdleSpan& span : idleSpansOf(positions, actions, keys, scrolling, duration))
 //         std::cout << "idle from " << span.start << " s to " << span.end << " s\n";

@@ -12,6 +12,7 @@
 #include "../Error.h"
 #include "../Recording.h"
 #include "../Track.h"
+#include "Activity.h"
 #include "Camera.h"
 #include "Chapters.h"
 #include "Clicks.h"
@@ -33,6 +34,7 @@ struct InsightOptions {
     CursorPathOptions path;     ///< how much the path is smoothed, for the camera as well
     ZoomOptions zooms;          ///< what makes a zoom
     CameraOptions camera;       ///< how the camera moves
+    ActivitySpan activity;      ///< what `activityOf` tells about
 };
 
 /// What insights are made of. Copies share the entries.

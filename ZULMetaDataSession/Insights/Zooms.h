@@ -38,7 +38,7 @@ struct ZoomPlace {
     double start = 0;                       ///< when to go there, in seconds
     double first = 0;                       ///< when the first click or key happens there, in seconds
     ScreenPoint centre;                     ///< the middle of `area`
-    ScreenRect area;                        ///< what is visible, in pixels of the recorded display; within the screen
+    ScreenRect area;                        ///< what is visible, in units of the display; within the screen
     ZoomReason reason = ZoomReason::Clicks; ///< what happens there
 };
 

@@ -6,7 +6,6 @@
 #include <new>
 #include <sstream>
 #include <string_view>
-#include <system_error>
 
 namespace ZULMetaData::detail {
 
@@ -14,6 +13,13 @@ namespace {
 
 std::string_view imageBytes(const CursorImage& cursor) {
     return {reinterpret_cast<const char*>(cursor.imageData), cursor.imageDataSize};
+}
+
+std::size_t pictureHash(const CursorImage& cursor) {
+    std::string key(imageBytes(cursor));
+    for (const std::int32_t number : {cursor.hotspotOffsetX, cursor.hotspotOffsetY, std::int32_t{cursor.cursorTypeId}})
+        key.append(reinterpret_cast<const char*>(&number), sizeof number);
+    return std::hash<std::string>()(key);
 }
 
 bool havePicturesAlike(const CursorImage& left, const CursorImage& right) {
@@ -72,15 +78,15 @@ std::string CursorEntries::stored(const CursorImage& cursor, double time) const 
 
 CursorImage CursorEntries::decoded(std::size_t entry) {
     auto cursor = decodeEntry<CursorImage>(index_.bytesOf(entry), index_.header().version);
-    if (!cursor) // the file has changed
-        throw std::system_error(std::make_error_code(std::errc::io_error), "cannot be read");
+    if (!cursor)
+        index_.refuseChange();
     return std::move(cursor->value);
 }
 
 CursorEntries::Picture CursorEntries::ownPictureOf(std::size_t entry, const CursorImage& cursor) {
     if (!cursor.imageData || cursor.imageDataSize == 0)
         return std::nullopt;
-    const std::size_t hash = std::hash<std::string_view>()(imageBytes(cursor));
+    const std::size_t hash = pictureHash(cursor);
     const auto [begin, end] = picturesByHash_.equal_range(hash);
     for (auto known = begin; known != end; ++known)
         if (havePicturesAlike(cursor, decoded(pictures_[known->second])))

@@ -1,8 +1,9 @@
 #include "ZULMetaDataSession/Retiming/EntryIndex.h"
 
+#include "ZULMetaDataSession/Error.h"
+
 #include <algorithm>
 #include <cmath>
-#include <system_error>
 #include <tuple>
 #include <utility>
 
@@ -19,7 +20,8 @@ bool fits(const MetaDataHeader& header, std::string_view bytes) {
 
 } // namespace
 
-EntryIndex::EntryIndex(const ByteSource& stream) : reader_(stream), timeOffset_(0), isDense_(false) {
+EntryIndex::EntryIndex(const ByteSource& stream, const std::string& file)
+    : file_(file), reader_(stream), timeOffset_(0), isDense_(false) {
     StreamEntries entries(stream);
     if (!entries.header())
         return;
@@ -31,7 +33,7 @@ EntryIndex::EntryIndex(const ByteSource& stream) : reader_(stream), timeOffset_(
     while (const auto entry = entries.next()) {
         const std::string_view bytes = entries.bytesOf(*entry);
         if (bytes.size() < entry->size)
-            throw std::system_error(std::make_error_code(std::errc::io_error), "cannot be read");
+            refuseChange();
         if (!fits(header_, bytes))
             break;
         add(numberIn<double>(bytes, timeOffset_), *entry);
@@ -88,6 +90,10 @@ std::size_t EntryIndex::countUntil(double time) const {
     return static_cast<std::size_t>(std::upper_bound(times_.begin(), times_.end(), time) - times_.begin());
 }
 
+void EntryIndex::refuseChange() const {
+    throw Error(file_, "has changed while it was read; try again");
+}
+
 std::string_view EntryIndex::bytesOf(std::size_t entry) {
     const std::uint64_t offset = offsetOf(entry);
     std::uint64_t size = header_.fixedEntrySize;
@@ -96,8 +102,8 @@ std::string_view EntryIndex::bytesOf(std::size_t entry) {
         size = stored.size() + (stored.empty() ? 0 : numberIn<std::uint32_t>(stored, 0));
     }
     const std::string_view bytes = at(offset, size);
-    if (bytes.size() < timeOffset_ + sizeof(double)) // the file has changed
-        throw std::system_error(std::make_error_code(std::errc::io_error), "cannot be read");
+    if (bytes.size() < timeOffset_ + sizeof(double))
+        refuseChange();
     return bytes;
 }
 

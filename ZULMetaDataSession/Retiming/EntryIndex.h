@@ -22,8 +22,9 @@ inline std::size_t timeOffsetIn(const MetaDataHeader& header) {
 /// stream. It reads the values when they are asked for.
 class EntryIndex {
 public:
-    /// Takes a stream that can be decoded. The walk ends at the first entry that does not fit its kind.
-    explicit EntryIndex(const ByteSource& stream);
+    /// Takes a stream that can be decoded. The walk ends at the first entry that does not fit its kind. Throws `Error`
+    /// that names `file` if the stream cannot be read.
+    EntryIndex(const ByteSource& stream, const std::string& file);
     EntryIndex(const EntryIndex&) = delete;
     EntryIndex& operator=(const EntryIndex&) = delete;
 
@@ -37,6 +38,9 @@ public:
 
     std::size_t countBefore(double time) const; ///< returns the number of entries before `time`
     std::size_t countUntil(double time) const;  ///< returns the number of entries at or before `time`
+
+    /// Throws the `Error` of an entry that is not what it was during the walk, because the file has changed.
+    [[noreturn]] void refuseChange() const;
 
     /// Return the bytes of an entry: all of them, or those after its time. They are valid until the next call.
     ///@{
@@ -53,6 +57,7 @@ private:
         return isDense_ ? s_metaDataHeaderSize + std::uint64_t{entry} * header_.fixedEntrySize : offsets_[entry];
     }
 
+    std::string file_;
     ByteReader reader_;
     MetaDataHeader header_;
     std::size_t timeOffset_;

@@ -5,7 +5,7 @@ cd /srv
 apt-get install -y -qq --no-install-recommends ./packages/*.deb >/dev/null
 
 awk '/^```/ { inside = !inside && $0 == "```cpp"; next } inside' README.md >example.cpp
-g++ -std=c++20 example.cpp -lZULMetaDataBridge -lZULMetaData -o example
+g++ -std=c++20 example.cpp -lZULMetaDataSession -lZULMetaDataBridge -lZULMetaData -o example
 printf '\0\0\0\20ftypmp42\0\0\0\0' >Movie.mp4
 
 {
@@ -15,10 +15,19 @@ printf '\0\0\0\20ftypmp42\0\0\0\0' >Movie.mp4
     zulm verify Movie.mp4
 } >printed.txt
 zulm view Movie.mp4 -o Movie.html
-grep -qx '640 0' printed.txt
+if zulm record -o Screen.mp4 2>refused.txt || [ $? -ne 2 ]; then
+    echo "zulm record is not refused without a display" >&2
+    exit 1
+fi
+cat refused.txt >>printed.txt
+[ ! -e Screen.mp4.recording ]
+zulm record --help | grep -q -e --recover
+ls /usr/share/man/man1/zulm-record.1* >/dev/null
+grep -qx 'at 0.5 s the cursor is at (640,360)' printed.txt
+grep -qx 'on top: Editor' printed.txt
 grep -q '^ *cursorLocation .* 2 ' printed.txt
 
-apt-get purge -y -qq zulm-tools libzulmetadata-dev libzulmetadata1 >/dev/null
+apt-get purge -y -qq zulm-record zulm-tools libzulmetadata-dev libzulmetadata1 >/dev/null
 if find /usr -iname '*zulm*' | grep .; then
     echo "the packages leave files behind" >&2
     exit 1

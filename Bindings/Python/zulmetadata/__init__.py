@@ -17,6 +17,7 @@ import importlib
 import json
 import os
 from collections.abc import Iterable, Iterator, Mapping
+from fractions import Fraction
 from types import TracebackType
 from typing import Any, Literal, Union, cast
 
@@ -47,20 +48,25 @@ from ._entries import Entries as _Entries
 from ._entries import Records as _Records
 from ._entries import records_of as _records_of
 from ._kinds import Kind
+from ._scan import Batch, Failure, OnError, Scan
 from ._tables import table_of as _table_of
 
 __all__ = [
     "Attached",
     "AttachedStream",
+    "Batch",
     "Creator",
+    "Failure",
     "Finding",
     "Kind",
+    "OnError",
     "RecordedStream",
     "Recording",
     "Repair",
     "RepairChange",
     "Report",
     "SaveError",
+    "Scan",
     "StreamReport",
     "StreamWriter",
     "__version__",
@@ -71,6 +77,7 @@ __all__ = [
     "modifiers_text",
     "recorded_kinds",
     "repair",
+    "scan",
     "stamp",
     "to_pandas",
     "verify",
@@ -141,7 +148,7 @@ class Recording(Mapping[Kind, _Records]):
 
     def track(self, kind: Kind) -> _Records:
         """Returns the entries of a kind with a finite time, in the order of their times. Entries at the same time keep
-        the order of the stream."""
+        the order of the stream. Raises a `KeyError` if the recording has no stream of the kind."""
         entries = self[kind]
         entries = entries[np.isfinite(entries["time"])]
         return entries[np.argsort(entries["time"], kind="stable")]
@@ -154,7 +161,8 @@ class Recording(Mapping[Kind, _Records]):
 
         A number that is not known is not-a-number, and anything else None. Buttons and modifiers are names with "+"
         between two, such as "shift+ctrl". With "linear" the cursor moves between two entries, but rests while nothing
-        was recorded; with "none" it is where the last entry says.
+        was recorded; with "none" it is where the last entry says. A stream that cannot be decoded is a `UserWarning`,
+        and nothing is known of it.
         """
         if interpolate not in ("linear", "none"):
             raise ValueError(f"interpolate is 'linear' or 'none', not {interpolate!r}")
@@ -162,17 +170,30 @@ class Recording(Mapping[Kind, _Records]):
         return _table_of(self._opened().states(asked, interpolate == "linear"))
 
     def insights(self, name: str, **parameters: float) -> _Records:
-        """Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path" or
-        "camera", with one record for each. Parameters change the defaults of the C++ library, by their names in lower
-        case with underscores, such as `least=3`. Another name raises a `ValueError`."""
+        """Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path",
+        "camera", "activity" or "applications". `dtype.names` of the result lists the fields. Parameters change the
+        defaults of the C++ library, by their names in lower case with underscores, such as `least=3`. Another name
+        raises a `ValueError`. A stream that cannot be decoded is a `UserWarning`."""
         return _table_of(self._opened().insight(name, {key: float(value) for key, value in parameters.items()}))
 
-    def retime(self, edits: str | Mapping[str, Any]) -> _Records:
-        """Returns the streams for a movie that was cut by an edit list: the JSON document, or the mapping that it
-        describes. A record has the `kind` and all `bytes` of a stream. If `is_copied` is 0, `moved`, `carried`,
-        `added` and `left_out` count its entries. An impossible list raises a `ValueError`."""
-        document = edits if isinstance(edits, str) else json.dumps(edits)
-        return _table_of(self._opened().retimed(document))[
+    def retime(
+        self, edits: str | Mapping[str, Any] | os.PathLike[str], *, frame_rate: float | str | Fraction | None = None
+    ) -> _Records:
+        """Returns the streams for a movie that was cut by an edit list. `edits` is the text of a list, the mapping that
+        a JSON document describes, or the path of a file, as a `pathlib.Path`. Lists of other programs are read, too.
+        `frame_rate`, such as 25 or "30000/1001", is for those that count frames. An impossible list raises a `ValueError`.
+
+        A record has the `kind` and all `bytes` of a stream. If `is_copied` is 0, `moved`, `carried`, `added` and
+        `left_out` count its entries. A `UserWarning` says what is not in the result, such as a hidden stream."""
+        name = "edits"
+        if isinstance(edits, os.PathLike):
+            name = os.fspath(edits)
+            with open(name, "rb") as file:
+                text = file.read()
+        else:
+            text = (edits if isinstance(edits, str) else json.dumps(edits)).encode()
+        rate = "" if frame_rate is None else str(frame_rate)
+        return _table_of(self._opened().retimed(text, name, rate))[
             ["kind", "bytes", "is_copied", "moved", "carried", "added", "left_out"]
         ]
 
@@ -210,6 +231,26 @@ def to_pandas(records: _Records) -> Any:
     pandas = importlib.import_module("pandas")
     frame = pandas.DataFrame({name: records[name] for name in records.dtype.names or ()})
     return frame.set_index("time") if "time" in frame else frame
+
+
+def scan(
+    recordings: _Path | Iterable[_Path],
+    kind: Kind,
+    *,
+    columns: Iterable[str] | None = None,
+    on_error: OnError = "raise",
+) -> Scan:
+    """Returns the entries of one kind in many recordings: in batches, as a pandas frame or as a Dask frame.
+
+        for batch in zulmetadata.scan("Recordings/**/*.mp4", "cursorLocation", columns=["x"], on_error="skip"):
+            print(batch.recording, batch.time[-1], batch.fields["x"].max())
+
+    `recordings` is a path, a pattern as `glob` has them (with "**" for folders inside folders, in the order of the
+    names), or an iterable of paths. `columns` are some of the fields of the kind; all of them if it is None. If a
+    recording cannot be read, its error is raised, or, if `on_error` is "skip" or "report", the others are read all the
+    same; "report" says afterwards what failed and why. A recording without entries of the kind is no failure.
+    """
+    return Scan(recordings, kind, None if columns is None else list(columns), on_error)
 
 
 _SOURCE_TYPES = (str, os.PathLike, RecordedStream, Recording)

@@ -1,6 +1,8 @@
 """Records clicks, keys and motions, and compares the instants of their entries with the frames that show them."""
 
+import json
 import os
+import random
 import statistics
 import sys
 import time
@@ -8,6 +10,7 @@ import time
 from check import Result
 
 ONE_FRAME = 1 / 60
+SHARED = 3  # times as late the median may be in the quick form, which shares its machine with others
 
 
 def use_desk(context):
@@ -22,18 +25,18 @@ def use_desk(context):
 
 
 def act(screen, events, pause):
-    """A person who clicks, presses keys, and moves the pointer in both ways."""
+    """A person who clicks, presses keys, and moves the pointer in both ways, at no steady pace."""
     for index in range(events):
         if index % 2:
             screen.xdotool("key", "a")
         else:
             screen.xdotool("click", 1)
-        time.sleep(pause / 2)
+        time.sleep(pause * random.uniform(0.3, 0.7))
         if index % 4 < 2:
             screen.xdotool("mousemove", 200 + index % 800, 300 + index % 200)
         else:
             screen.xdotool("mousemove_relative", "--", 3, -2)
-        time.sleep(pause / 2)
+        time.sleep(pause * random.uniform(0.3, 0.7))
 
 
 def colour_index(pixel):
@@ -41,6 +44,17 @@ def colour_index(pixel):
         return 7
     red, green, blue = (channel > 170 for channel in pixel)
     return red << 2 | green << 1 | blue
+
+
+def drawing_delays(window):
+    """How long after each click and key the server had drawn its colour, in seconds and in order."""
+    events = [(int(words[-1]), kind) for kind in ("button", "key") for words in window.lines(kind)]
+    drawn = {int(count): float(moment) for count, moment in window.lines("drawn")}
+    delays = []
+    for count, (moment, _) in enumerate(sorted(events), start=1):
+        later = [drawn[number] for number in sorted(drawn) if number >= count]
+        delays.append((later[0] - moment % 2**32) / 1000 if later else 0)
+    return delays
 
 
 def latenesses(desk, streams, recording):
@@ -63,11 +77,16 @@ def latenesses(desk, streams, recording):
 
 
 def slope(points):
-    """Seconds of lateness that each second adds."""
-    middle = statistics.fmean(when for when, _ in points)
-    mean = statistics.fmean(late for _, late in points)
-    spread = sum((when - middle) ** 2 for when, _ in points)
-    return sum((when - middle) * (late - mean) for when, late in points) / spread if spread else 0
+    """Seconds of lateness that each second adds: the median of all pairs, which single late frames do not turn."""
+    slopes = [(late - earlier) / (when - before) for index, (before, earlier) in enumerate(points)
+              for when, late in points[index + 1:] if when > before]
+    return statistics.median(slopes) if slopes else 0
+
+
+def figures(points):
+    """The median, the 99th percentile, the largest, and the drift in a minute, all in milliseconds."""
+    late = sorted(1000 * lateness for _, lateness in points)
+    return statistics.median(late), late[int(0.99 * (len(late) - 1))], late[-1], 60000 * slope(points)
 
 
 def run(context):
@@ -75,23 +94,26 @@ def run(context):
     result = Result()
     events, pause = (600, 1.0) if context.full else (60, 0.12)
     with desk.Desk() as screen:
-        screen.show(0, 0, 1280, 700)
+        window = screen.show(0, 0, 1280, 700)
         screen.xdotool("mousemove", 600, 400)
         recording = screen.record("--fps", "60", "--keys", "all", "--without-accessibility")
         act(screen, events, pause)
         if recording.stop() != 0:
             result.failures.append(recording.errors())
+            return result
         told, found = latenesses(desk, streams, recording)
+        delays = drawing_delays(window)
+        report = json.loads(recording.json.read_text())
     result.cases = events
     result.lost = events - min(len(told), len(found))
-    late = sorted(lateness for _, lateness in found)
-    median = statistics.median(late)
-    most = late[int(0.99 * (len(late) - 1))]
-    drift = 60 * slope(found)
-    result.notes.append(f"picture after its entry: median {1000 * median:.1f} ms, 99th percentile {1000 * most:.1f} ms, "
-                        f"drift {1000 * drift:.2f} ms a minute")
-    if abs(median) >= ONE_FRAME:
-        result.failures.append(f"the median, {1000 * median:.1f} ms, is not below one frame at 60 fps")
-    if context.full and (most >= 2 * ONE_FRAME or abs(drift) >= 0.001):  # the quick form shares its machine
-        result.failures.append(f"99th percentile {1000 * most:.1f} ms, drift {1000 * drift:.2f} ms a minute")
+    own = [(when, late - delay) for (when, late), delay in zip(found, delays)]
+    result.notes.append(f"{report['frames']} frames in {report['duration']:.0f} s, {report['dropped']} dropped")
+    result.notes.append("| picture after its entry | median | 99th percentile | largest | drift in a minute |")
+    for name, points in (("as recorded", found), ("less what the window took to draw it", own)):
+        result.notes.append(f"| {name} | " + " | ".join(f"{value:.2f} ms" for value in figures(points)) + " |")
+    median, most, _, drift = figures(own)
+    if abs(median) >= 1000 * ONE_FRAME * (1 if context.full else SHARED):
+        result.failures.append(f"the median is {median:.1f} ms")
+    if context.full and (most >= 2000 * ONE_FRAME or abs(drift) >= 1):
+        result.failures.append(f"99th percentile {most:.1f} ms, drift {drift:.2f} ms a minute")
     return result

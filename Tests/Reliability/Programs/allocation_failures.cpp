@@ -11,6 +11,7 @@
 #include "Tests/ZULMetaDataBridge/EntriesAsText.h"
 #include "Tests/ZULMetaDataBridge/KindSamples.h"
 #include "ZULMetaDataBridge/ZULMetaDataBridge.h"
+#include "ZULMetaDataSession/ZULMetaDataSession.h"
 
 #include <cstdio>
 #include <fcntl.h>
@@ -451,6 +452,136 @@ void addDamaged(std::vector<Operation>& operations, const std::string& folder) {
     operations.push_back(reporting("salvage", [=] { return salvagedFrom(bytes); }));
 }
 
+// ---- sessions ---------------------------------------------------------------------------------------------------
+
+/// Runs `work`. If there is no memory for opening a file, the error says so.
+template <class Work>
+void orBadAlloc(Work work) {
+    try {
+        work();
+    } catch (const Error& error) {
+        if (error.sentence().find("Cannot allocate memory") != std::string::npos)
+            throw std::bad_alloc();
+        throw;
+    }
+}
+
+std::string stateIn(const std::string& file) {
+    std::string text;
+    orBadAlloc([&] {
+        const Recording recording{FileLocation(file)};
+        const Snapshot state = recording.at(100);
+        text = std::string(state.title.value_or("")) + std::string(state.application.value_or("")) +
+               std::to_string(state.cursor ? state.cursor->x : 0) + std::to_string(state.keys.size()) +
+               std::to_string(recording.hiddenStreams().size());
+    });
+    return text;
+}
+
+std::string insightsIn(const std::string& file) {
+    std::string text;
+    orBadAlloc([&] {
+        const Insights insights = insightsOf(Recording(FileLocation(file)));
+        text = std::to_string(insights.clicks.size()) + ' ' + std::to_string(insights.path.times().size());
+        for (const KeyCaption& caption : insights.captions)
+            text += caption.text;
+        for (const Chapter& chapter : insights.chapters)
+            text += chapter.title;
+    });
+    return text;
+}
+
+std::string retimedStreamsOf(const std::string& file, const std::string& edits) {
+    std::string all;
+    orBadAlloc([&] {
+        const Recording recording{FileLocation(file)};
+        for (const EditedStream& stream : retimed(recording, EditList::read(edits, "edits.json")).streams) {
+            std::string bytes(static_cast<std::size_t>(stream.bytes.size()), '\0');
+            stream.bytes.read(0, bytes);
+            all += bytes;
+        }
+    });
+    return all;
+}
+
+/// Returns whether all was recorded.
+bool recordSession(const std::string& folder, const std::function<void(SessionWriter&)>& end) {
+    bool isHealthy = false;
+    orBadAlloc([&] {
+        CursorAppearance arrow;
+        arrow.id = 7;
+        arrow.picture = std::make_shared<const CursorPicture>(CursorPicture{{1, 2, 3}, {4, 5}, CursorTypeUnknown});
+        SessionWriter session{FileLocation(folder)};
+        for (int i = 0; i < 3; ++i) {
+            session.write<CursorLocationKind>(i, Point(i, -i));
+            session.write<CursorImageKind>(i, arrow);
+            session.write<TopmostAppNameKind>(i, "an application with a long name, for which memory is needed");
+        }
+        end(session);
+        isHealthy = session.isHealthy();
+    });
+    return isHealthy;
+}
+
+std::map<std::string, std::string> filesIn(const std::string& folder) {
+    std::map<std::string, std::string> files;
+    std::error_code isMissing;
+    for (const auto& entry : std::filesystem::directory_iterator(folder, isMissing))
+        files[entry.path().filename().string()] = contentsOf(entry.path().string());
+    files.erase("session.lock");
+    return files;
+}
+
+Operation recordingASession(const std::string& folder) {
+    const std::string place = folder + "/Session";
+    const auto finish = [](SessionWriter& session) { session.finish(); };
+    recordSession(place, finish);
+    const auto whole = std::make_shared<std::map<std::string, std::string>>(filesIn(place));
+    const auto isHealthy = std::make_shared<bool>();
+    Operation operation{.name = "record a session"};
+    operation.prepare = [=] {
+        std::filesystem::remove_all(place);
+        *isHealthy = false;
+    };
+    operation.run = [=] { *isHealthy = recordSession(place, finish); };
+    operation.complaint = [=](bool) -> std::string {
+        const auto files = filesIn(place);
+        for (const auto& [name, contents] : files)
+            if (!whole->at(name).starts_with(contents))
+                return "left " + name + ", which is no beginning of what was recorded";
+        return *isHealthy && files != *whole ? "lost entries and stayed healthy" : "";
+    };
+    return operation;
+}
+
+/// Lost entries leave a movie without them.
+Operation savingASession(const Movie& movie, const std::string& folder) {
+    const std::string place = folder + "/Session";
+    const std::string path = movie.path;
+    Operation operation = safely(
+        "save a session", movie,
+        [=] { recordSession(place, [&](SessionWriter& session) { session.saveInto(FileLocation(path)); }); },
+        [](const std::string& bytes) { return bytes.starts_with(closedMedia()); });
+    operation.prepare = [=, writeMovie = operation.prepare] {
+        writeMovie();
+        std::filesystem::remove_all(place);
+    };
+    return operation;
+}
+
+void addSessions(std::vector<Operation>& operations, const Movie& movie, const std::string& folder,
+                 const std::string& recording) {
+    const std::string edits = R"({"schema": "zulm.edits", "schema_version": 1, "pieces": [
+        {"start": 1, "end": "7/3", "speed": "1000000007/3000000019"}, {"at": "1.5", "duration": 2},
+        {"start": "0", "end": "1000000"}]})";
+    operations.push_back(reporting("read an edit list", [=] { return EditList::read(edits, "edits.json").json(); }));
+    operations.push_back(reporting("tell a state", [=] { return stateIn(recording); }));
+    operations.push_back(reporting("find insights", [=] { return insightsIn(recording); }));
+    operations.push_back(reporting("retime", [=] { return retimedStreamsOf(recording, edits); }));
+    operations.push_back(recordingASession(folder));
+    operations.push_back(savingASession(movie, folder));
+}
+
 // -----------------------------------------------------------------------------------------------------------------
 
 template <class... S>
@@ -481,6 +612,7 @@ int main(int argc, char** argv) {
     addPictures(operations);
     addMovies(operations, movie);
     addDamaged(operations, folder);
+    addSessions(operations, movie, folder, recording);
     bool isRight = true;
     for (Operation& operation : operations)
         isRight &= Exercise(std::move(operation)).run();

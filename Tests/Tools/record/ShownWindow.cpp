@@ -2,10 +2,12 @@
 //
 // Its picture changes with each click and key: the colour of the field in the middle counts them. A white square of 17
 // pixels is drawn where the pointer is. What happens is printed, one line for each event, with its time on the clock of
-// the X server. Lines on standard input change the window: "title TEXT", "class TEXT", "cursor NUMBER", "move X Y",
-// "resize W H", "blank" (a cursor without pixels), "close".
+// the X server; "drawn COUNT TIME" says when the server had drawn a colour. Lines on standard input change the window:
+// "title TEXT", "class TEXT", "cursor NUMBER", "move X Y", "resize W H", "blank" (a cursor without pixels), "hide" and
+// "show" (the cursor, for all windows), "close".
 
 #include <xcb/xcb.h>
+#include <xcb/xfixes.h>
 
 #include <poll.h>
 #include <unistd.h>
@@ -15,6 +17,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <ctime>
 #include <iostream>
 #include <memory>
 #include <sstream>
@@ -51,6 +54,8 @@ public:
         xcb_create_window(connection_, XCB_COPY_FROM_PARENT, window_, screen_->root, x, y, width, height, 0,
                           XCB_WINDOW_CLASS_INPUT_OUTPUT, screen_->root_visual,
                           XCB_CW_BACK_PIXEL | XCB_CW_OVERRIDE_REDIRECT | XCB_CW_EVENT_MASK, values.data());
+        const auto fixes = xcb_xfixes_query_version(connection_, 4, 0);
+        std::free(xcb_xfixes_query_version_reply(connection_, fixes, nullptr));
         setTitle("Shown Window");
         setClass("ShownWindow");
         std::array<std::uint32_t, 18> sizes{};
@@ -78,8 +83,11 @@ public:
             draw();
             std::fflush(stdout);
             poll(waits.data(), waits.size(), 1000);
-            if ((waits[1].revents & (POLLIN | POLLHUP)) != 0)
+            if ((waits[1].revents & (POLLIN | POLLHUP)) == 0)
+                continue;
+            do { // several lines may have come at once
                 readLine();
+            } while (!isOver_ && std::cin.rdbuf()->in_avail() > 0);
         }
     }
 
@@ -152,9 +160,22 @@ private:
             y_ = nextY_;
             fill(0xffffff, markerAt(x_, y_));
         }
-        if (isStale_ || isMoved_)
+        if (isStale_)
+            tellDrawn();
+        else if (isMoved_)
             xcb_flush(connection_);
         isStale_ = isMoved_ = false;
+    }
+
+    /// Waits until the server has drawn, whose clock this machine's is too.
+    void tellDrawn() {
+        const auto cookie = xcb_get_input_focus(connection_);
+        const std::unique_ptr<xcb_get_input_focus_reply_t, FreeDeleter> reply(
+            xcb_get_input_focus_reply(connection_, cookie, nullptr));
+        timespec time{};
+        clock_gettime(CLOCK_MONOTONIC, &time);
+        std::printf("drawn %zu %lld.%06ld\n", count_, time.tv_sec * 1000LL + time.tv_nsec / 1'000'000,
+                    time.tv_nsec % 1'000'000);
     }
 
     void setTitle(const std::string& title) {
@@ -220,6 +241,10 @@ private:
             setCursor(static_cast<std::uint16_t>(two[0]), false);
         else if (what == "blank")
             setCursor(0, true);
+        else if (what == "hide")
+            xcb_xfixes_hide_cursor(connection_, window_);
+        else if (what == "show")
+            xcb_xfixes_show_cursor(connection_, window_);
         else if (what == "move")
             xcb_configure_window(connection_, window_, XCB_CONFIG_WINDOW_X | XCB_CONFIG_WINDOW_Y, two.data());
         else if (what == "resize")
@@ -249,6 +274,7 @@ private:
 
 /// ShownWindow X Y WIDTH HEIGHT [unmanaged]
 int main(int argc, char** argv) {
+    std::ios::sync_with_stdio(false); // so that it knows of lines that it has read ahead
     constexpr int geometry = 5;
     if (argc < geometry)
         return 2;

@@ -26,17 +26,21 @@ def end(process, number=signal.SIGTERM):
 class Desk:
     """What runs on one X display. Everything ends with it."""
 
-    def __init__(self, size="1280x720x24", manager="openbox", layout=None):
+    def __init__(self, size="1280x720x24", manager="openbox", layout=None, server=()):
         self.folder = pathlib.Path(tempfile.mkdtemp(prefix="zulm-desk-"))
         self.processes = []
         read, write = os.pipe()
         self.environment = {name: value for name, value in os.environ.items()
                             if name not in ("DBUS_SESSION_BUS_ADDRESS", "AT_SPI_BUS_ADDRESS", "WAYLAND_DISPLAY")}
         self.environment.update(HOME=str(self.folder), XDG_RUNTIME_DIR=str(self.folder), LC_ALL="C.UTF-8")
-        self.start(["Xvfb", "-displayfd", str(write), "-screen", "0", size, "-nolisten", "tcp", "-noreset"], pass_fds=[write])
+        self.server = self.start(["Xvfb", "-displayfd", str(write), "-screen", "0", size, "-nolisten", "tcp",
+                                  "-noreset", *server], pass_fds=[write])
         os.close(write)
         with os.fdopen(read) as numbers:
-            self.display = ":" + numbers.readline().strip()
+            number = numbers.readline().strip()
+        if not number:
+            raise OSError("Xvfb has ended at once")
+        self.display = f":{number}"
         self.environment["DISPLAY"] = self.display
         if layout:
             self.run("setxkbmap", *layout)
@@ -50,6 +54,9 @@ class Desk:
     def __exit__(self, *_):
         for process in reversed(self.processes):
             end(process)
+            for pipe in (process.stdin, process.stdout):
+                if pipe:
+                    pipe.close()
         shutil.rmtree(self.folder, ignore_errors=True)
 
     def start(self, command, **options):
@@ -79,6 +86,24 @@ class Desk:
     def show(self, *geometry, managed=True):
         window = Window(self, geometry or (200, 100, 800, 500), managed)
         return window
+
+    def start_bus(self):
+        """A session bus, by which applications and the recorder find the accessibility bus."""
+        bus = self.start(["dbus-daemon", "--session", "--print-address", "--nofork"], stdout=subprocess.PIPE, text=True)
+        self.environment["DBUS_SESSION_BUS_ADDRESS"] = bus.stdout.readline().strip()
+
+    def start_sound(self):
+        """A sound server whose only device is silent; what is played there can be recorded."""
+        self.start(["pulseaudio", "-n", "--daemonize=no", "--exit-idle-time=-1", "--use-pid-file=no",
+                    "--load=module-native-protocol-unix", "--load=module-null-sink sink_name=desk"])
+        self.wait_for(lambda: "desk.monitor" in self.run("pactl", "list", "short", "sources"))
+
+    def open_form(self):
+        """The window of form.py. Returns where its fields are, by their names."""
+        form = self.start(["/usr/bin/python3", os.path.join(os.path.dirname(__file__), "form.py")], stdout=subprocess.PIPE,
+                          text=True)
+        words = [form.stdout.readline().split() for _ in range(3)]
+        return {word[1]: tuple(int(number) for number in word[2:]) for word in words if word}
 
     def record(self, *options, name="out.mp4", wait=True):
         return Recording(self, self.folder / name, options, wait)

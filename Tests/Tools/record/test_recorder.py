@@ -1,9 +1,11 @@
 """What the recorder promises, seen from outside: an X server without a screen, a person made of xdotool, and a window
 that shows what happens to it. Streams are read by streams.py, pictures by ffmpeg."""
 
+import contextlib
 import json
 import os
 import pathlib
+import pty
 import shutil
 import signal
 import stat
@@ -135,11 +137,10 @@ class Files(Test):
             recording.process.send_signal(signal.SIGINT)
             recording.process.send_signal(signal.SIGTERM)
             recording.process.send_signal(signal.SIGCONT)
-            code = recording.process.wait(30)
-            if code != 0:  # both may have arrived as one
-                self.assertIn(code, (128 + signal.SIGINT, 128 + signal.SIGTERM))
-                self.assertEqual(recording.errors().splitlines()[-1], str(recording.folder))
-                self.assertTrue(recording.folder.exists())
+            self.assertEqual(recording.process.wait(30), 128 + signal.SIGTERM)  # SIGINT has the lower number
+            self.assertEqual(recording.errors().splitlines()[-1], str(recording.folder))
+            self.assertTrue(recording.folder.exists())
+            self.assertFalse(recording.output.exists())
 
 
 class Picture(Test):
@@ -172,6 +173,90 @@ class Picture(Test):
                   f"largest {1000 * max(late):.1f} ms")
             self.assertGreater(min(late), -0.017)
             self.assertEqual(len(window.lines("button")) + len(window.lines("key")), 30)
+
+
+    def colour_of_strip(self, recording, place):
+        return [colour_index(frame[:3]) for frame in pixels(recording.output, (*place, 2, 2))]
+
+    def test_a_window_is_recorded_though_others_cover_it(self):
+        with Desk() as desk:
+            window = desk.show(200, 100, 400, 300)
+            desk.xdotool("mousemove", 400, 300, "click", 1)
+            recording = desk.record("--window", str(window.id))
+            desk.show(0, 0, 1280, 720, managed=False)
+            desk.xdotool("mousemove", 800, 600, "click", 1, "click", 1)
+            time.sleep(0.5)
+            streams = self.recorded(recording)
+            region = streams["recordingRegion"][0].value
+            self.assertTrue(region[0] <= 200 and region[2] in range(400, 500), region)
+            strip = (200 - region[0] + 200, region[3] - 300 + 20)
+            colours = self.colour_of_strip(recording, strip)
+            self.assertEqual(set(colours), {1}, "what covers the window is in its picture")
+
+    def test_a_window_that_becomes_smaller_is_recorded_on(self):
+        for server in ([], ["-extension", "MIT-SHM"]):
+            with Desk(manager=None, server=server) as desk:
+                window = desk.show(100, 100, 400, 300, managed=False)
+                desk.xdotool("mousemove", 200, 250, "click", 1)
+                recording = desk.record("--window", str(window.id))
+                window.tell("resize 203 151")
+                time.sleep(0.5)
+                desk.xdotool("click", 1)
+                time.sleep(0.5)
+                self.recorded(recording)
+                document = json.loads(recording.json.read_text())
+                self.assertLess(document["dropped"], document["frames"])
+                self.assertEqual(self.colour_of_strip(recording, (100, 20))[-1], 2)
+                self.assertEqual(pixels(recording.output, (100, 100, 2, 2))[-1][0] // 16, 4)  # its background
+                self.assertLess(max(pixels(recording.output, (300, 200, 2, 2))[-1]), 16)
+
+    def test_pictures_come_without_shared_memory_too(self):
+        with Desk(server=["-extension", "MIT-SHM"]) as desk:
+            desk.show(0, 0, 1280, 700)
+            desk.xdotool("mousemove", 600, 400)
+            recording = desk.record()
+            time.sleep(0.5)
+            desk.xdotool("click", 1)
+            time.sleep(0.5)
+            streams = self.recorded(recording)
+            x, y = streams["topmostWindow"][0].value[:2]
+            colours = self.colour_of_strip(recording, (x + 600, y + 50))
+            self.assertEqual((colours[0], colours[-1]), (0, 1))
+            self.assertEqual(streams["cursorLocation"][0].value, (600, 400))
+
+
+class Sound(Test):
+    def test_what_is_heard_is_in_the_movie_at_its_time(self):
+        if missing := [name for name in ("pulseaudio", "pactl") if not shutil.which(name)]:
+            self.skipTest(f"there is no {missing[0]}")
+        with Desk() as desk:
+            window = desk.show(0, 0, 1280, 700)
+            desk.start_sound()
+            desk.xdotool("mousemove", 600, 400)
+            recording = desk.record("--audio", "desk.monitor")
+            desk.xdotool("click", 1)
+            tone = pathlib.Path(__file__).with_name("tone.py")
+            heard = float(desk.run(sys.executable, str(tone), "2"))
+            streams = self.recorded(recording)
+            click = [entry.time for entry in streams["cursorAction"] if entry.value == 1][0]
+            zero = int(window.lines("button")[0][1]) / 1000 - click
+            sound = subprocess.run(["ffmpeg", "-v", "error", "-i", recording.output, "-map", "a", "-f", "f32le", "-ac",
+                                    "1", "-ar", "48000", "-"], capture_output=True, check=True, timeout=60).stdout
+            samples = struct.unpack(f"<{len(sound) // 4}f", sound)
+            loud = [index for index, sample in enumerate(samples) if abs(sample) > 0.1]
+            self.assertTrue(loud, "the movie is silent")
+            late = loud[0] / 48000 - (heard - zero)
+            print(f"sound after its time: {1000 * late:.1f} ms")
+            self.assert_near((loud[-1] - loud[0]) / 48000, 1, 0.5)  # who plays it may come too late
+            self.assert_near(late, 0, 0.1)
+            length = json.loads(recording.json.read_text())["duration"]
+            self.assert_near(len(samples) / 48000, length, 0.25)
+
+    def test_a_source_that_is_not_there_is_refused(self):
+        with Desk(manager=None) as desk:
+            recording = desk.record("--audio", "nothing", wait=False)
+            self.assertEqual(recording.process.wait(30), 2)
+            self.assertFalse(recording.folder.exists())
 
 
 class Pointer(Test):
@@ -243,6 +328,23 @@ class Pointer(Test):
             self.assertEqual([entry.value for entry in streams["cursorOpacity"]], [1, 0, 1])
 
 
+    def test_a_cursor_that_another_program_hides_has_no_opacity(self):
+        with Desk() as desk:
+            window = desk.show()
+            desk.xdotool("mousemove", 600, 400)
+            recording = desk.record()
+            for line in ("hide", "hide", "show", "show"):  # it is hidden as long as it was hidden more often than shown
+                window.tell(line)
+                time.sleep(0.2)
+            window.tell("hide")
+            time.sleep(0.2)
+            window.tell("close")  # whoever hides it and ends shows it again
+            time.sleep(0.2)
+            opacities = self.recorded(recording)["cursorOpacity"]
+            self.assertEqual([entry.value for entry in opacities], [1, 0, 1, 0, 1])
+            self.assertGreater(opacities[2].time - opacities[1].time, 0.35)
+
+
 class Keys(Test):
     def keys(self, desk, options, press, window=True):
         if window:
@@ -282,7 +384,11 @@ class Keys(Test):
                                     (ord("й"), CONTROL)])
 
     def test_texts_of_two_layouts(self):
-        texts = {"us": "The quick brown fox jumps over 13 lazy dogs, {twice}!", "de": "Zwölf Boxkämpfer jagen, äöüß?"}
+        texts = {"us": "The quick brown fox jumps over 13 lazy dogs, {twice}! It's 7 + 5 = 12; #4 & 'x' [is] ~99%? "
+                       "abc-xyz/QWERTY.",
+                 "de": "Zwölf Boxkämpfer jagen Viktor quer über den großen Sylter Deich: äöüÄÖÜß? Ja, 3 + 4 = 7! "
+                       "Q#y;z-Übung (2)."}
+        self.assertTrue(all(len(text) >= 100 for text in texts.values()))
         for layout, text in texts.items():
             with Desk(layout=["-layout", layout]) as desk:
                 typed = self.keys(desk, ALL_KEYS, lambda: desk.xdotool("type", "--delay", "20", text))
@@ -360,6 +466,30 @@ class Windows(Test):
             self.assertEqual([chr(entry.value[0]) for entry in streams["keyboardAction"]], ["a", "c"])
 
 
+    def test_denied_applications_leave_no_title_key_or_rectangle(self):
+        with Desk() as desk:
+            window = desk.show()
+            desk.xdotool("mousemove", 600, 300)
+            recording = desk.record(*ALL_KEYS, "--deny-app", "^vault$")
+            desk.xdotool("key", "a")
+            time.sleep(0.3)
+            window.tell("class Vault")
+            time.sleep(0.3)
+            desk.xdotool("key", "b")
+            desk.xdotool("mousemove", 20, 20)  # out of the window
+            time.sleep(0.3)
+            desk.xdotool("mousemove", 600, 300)
+            time.sleep(0.3)
+            window.tell("class Editor")
+            time.sleep(0.3)
+            desk.xdotool("key", "c")
+            streams = self.recorded(recording)
+            self.assertEqual([entry.value for entry in streams["topmostWindowTitle"]],
+                             ["Shown Window", "", "Shown Window"])
+            self.assertEqual([chr(entry.value[0]) for entry in streams["keyboardAction"]], ["a", "c"])
+            self.assertEqual(len({entry.value for entry in streams["hoverRect"]}), 1)
+
+
 class Control(Test):
     def test_a_pause_is_not_in_the_recording(self):
         with Desk() as desk:
@@ -412,6 +542,38 @@ class Control(Test):
             self.assertEqual(recording.process.wait(20), 0, recording.errors())
             self.assertEqual(json.loads(recording.json.read_text())["stopped_by"], "window")
 
+    def test_a_terminal_shows_how_it_goes(self):
+        with Desk() as desk:
+            desk.show()
+            ours, theirs = pty.openpty()
+            process = desk.start([PROGRAMS["recorder"], "-o", str(desk.folder / "out.mp4"), "--duration", "2"],
+                                 stderr=theirs)
+            os.close(theirs)
+            text = b""
+            with contextlib.suppress(OSError):  # the end of a terminal
+                while part := os.read(ours, 4096):
+                    text += part
+            os.close(ours)
+            self.assertEqual(process.wait(30), 0)
+            lines = text.decode().replace("\n", "\r").split("\r")
+            self.assertIn(f"recording {desk.folder / 'out.mp4'}", lines)
+            status = [line for line in lines if line.startswith("recording 00:00:01")]
+            self.assertTrue(status, lines)
+            self.assertRegex(status[0], r"^recording 00:00:01  \d+ frames, \d+ dropped  \d+ entries  "
+                                        r"movie \d+\.\d MiB, streams \d+\.\d MiB  $")
+
+    def test_a_display_that_goes_away_ends_it(self):
+        with Desk() as desk:
+            desk.show()
+            recording = desk.record()
+            time.sleep(1)
+            desk.server.kill()
+            self.assertEqual(recording.process.wait(20), 3)
+            self.assertIn("the X display is gone", recording.errors())
+            self.assertEqual(json.loads(recording.json.read_text())["stopped_by"], "error")
+            self.assertFalse(recording.folder.exists())
+            self.assertGreater(frame_times(recording.output)[-1], 0.5)
+
     def test_nobody_to_control(self):
         with Desk(manager=None) as desk:
             self.assertIn("no recorder is running", desk.run(PROGRAMS["recorder"], "--stop"))
@@ -459,6 +621,28 @@ class Loss(Test):
             self.assertEqual(subprocess.run(command, check=False, capture_output=True).returncode, 3)
             self.assertTrue(recording.output.exists())
 
+    def test_what_is_recorded_is_on_the_disk_each_second(self):
+        """A loss of power takes what is in the memory of the system, so all of it goes to the disk again and again."""
+        if not shutil.which("strace"):
+            self.skipTest("there is no strace")
+        with Desk() as desk:
+            desk.show()
+            calls = desk.folder / "calls"
+            recording = desk.record()
+            tracer = desk.start(["strace", "-f", "-y", "-e", "trace=fdatasync", "-o", str(calls), "-p",
+                                 str(recording.process.pid)])
+
+            def is_synced_again_and_again():
+                desk.xdotool("mousemove_relative", 1, 0)
+                lines = calls.read_text().splitlines() if calls.exists() else []
+                return all(sum(f"/{name}>" in line for line in lines) >= 3
+                           for name in ("movie.mp4", "cursorLocation.dat", "systemData.dat"))
+
+            desk.wait_for(lambda: is_synced_again_and_again() or tracer.poll() is not None)
+            if tracer.poll() is not None:
+                self.skipTest("no process may be traced here")
+            self.recorded(recording)
+
     def test_nothing_to_recover(self):
         with tempfile.TemporaryDirectory() as folder:
             empty = pathlib.Path(folder) / "a.mp4.recording"
@@ -471,14 +655,10 @@ class Loss(Test):
 class Privacy(Test):
     """With the accessibility bus, whose address is that of the root window of the desk."""
 
-    def start_bus(self, desk):
-        bus = desk.start(["dbus-daemon", "--session", "--print-address", "--nofork"], stdout=subprocess.PIPE, text=True)
-        desk.environment["DBUS_SESSION_BUS_ADDRESS"] = bus.stdout.readline().strip()
-
     def test_what_is_not_known_is_left_out(self):
         """ShownWindow tells the bus nothing, so nobody knows whether it shows a password field."""
         with Desk() as desk:
-            self.start_bus(desk)
+            desk.start_bus()
             desk.show()
             for options in (["--keys", "all"], ["--keys", "shortcuts"]):
                 recording = desk.record(*options, name=options[1] + ".mp4")
@@ -488,10 +668,44 @@ class Privacy(Test):
                 self.assertNotIn("keyboardAction", streams)
                 self.assertEqual([entry.value for entry in streams["cursorAction"]], [256, 1, 2])
 
+    def test_what_is_typed_into_a_password_field_is_left_out(self):
+        with Desk() as desk:
+            desk.start_bus()
+            if not desk.open_form():
+                self.skipTest("there is no GTK for Python")
+            desk.wait_for(lambda: "Form" in desk.xdotool("getactivewindow", "getwindowname"))
+            recording = desk.record("--keys", "all")
+            time.sleep(0.6)
+            desk.xdotool("type", "--delay", "30", "SECRET7")
+            time.sleep(0.6)
+            desk.xdotool("key", "Tab")
+            time.sleep(0.8)
+            desk.xdotool("type", "--delay", "30", "open")
+            time.sleep(0.8)
+            keys = [entry.value[0] for entry in self.recorded(recording)["keyboardAction"]]
+            self.assertEqual([chr(key) for key in keys if key > 32], list("open"))
+            self.assertFalse([file for file in desk.folder.rglob("*") if file.is_file() and
+                              b"SECRET7" in file.read_bytes()])
+
+    def test_the_bus_tells_what_the_pointer_is_over(self):
+        with Desk() as desk:
+            desk.start_bus()
+            fields = desk.open_form()
+            if not fields:
+                self.skipTest("there is no GTK for Python")
+            desk.wait_for(lambda: "Form" in desk.xdotool("getactivewindow", "getwindowname"))
+            recording = desk.record()
+            for x, y, width, height in fields.values():
+                desk.xdotool("mousemove", x + width // 2, y + height // 2)
+                time.sleep(0.7)
+            rects = [entry.value for entry in self.recorded(recording)["hoverRect"]]
+            for name, field in fields.items():
+                self.assertIn(field, rects, name)
+
     def test_a_watcher_that_dies_or_hangs_harms_nothing(self):
         for number in (signal.SIGKILL, signal.SIGSTOP):
             with Desk() as desk:
-                self.start_bus(desk)
+                desk.start_bus()
                 desk.show()
                 recording = desk.record("--keys", "all")
                 watchers = desk.run("pgrep", "-P", str(recording.process.pid)).split()

@@ -26,16 +26,20 @@ if(ZULM_VIEWER AND CHROMIUM)
   add_custom_target(viewer_test_packages ALL DEPENDS ${viewer_packages}/installed)
   set(viewer_settings ZULM_PATH=${ZULM_PATH} ZULM_TEST_DATA=${CMAKE_CURRENT_SOURCE_DIR}/Data CHROMIUM=${CHROMIUM}
     ZULM_TEST_MODULES=${viewer_packages} ZULM_LONG_RECORDING=$<TARGET_FILE:long_recording>)
-  foreach(test IN ITEMS access frames hostile session speed timeline touch)
+  foreach(test IN ITEMS access belonging frames hostile lanes long notes range session speed table timeline touch transport)
     add_test(NAME viewer/${test}
       COMMAND ${CMAKE_COMMAND} -E env ${viewer_settings} ${NODE} --test ${viewer_tests}/${test}.test.mjs)
     set_tests_properties(viewer/${test} PROPERTIES TIMEOUT 600)
   endforeach()
-  set_tests_properties(viewer/frames viewer/speed PROPERTIES RUN_SERIAL TRUE)
+  set_tests_properties(viewer/frames PROPERTIES RUN_SERIAL TRUE)
 
   # The pictures of the documentation.
+  set(recorder_setting "")
+  if(ZULMETADATA_RECORDER)
+    set(recorder_setting ZULM_RECORD=$<TARGET_FILE:zulm-record>)
+  endif()
   add_custom_target(viewer_screenshots
-    COMMAND ${CMAKE_COMMAND} -E env ${viewer_settings} ${NODE} ${viewer_tests}/screenshots.mjs
+    COMMAND ${CMAKE_COMMAND} -E env ${viewer_settings} ${recorder_setting} ${NODE} ${viewer_tests}/screenshots.mjs
       ${PROJECT_SOURCE_DIR}/Docs/viewer
     DEPENDS viewer_test_packages zulm
     VERBATIM)

@@ -22,12 +22,27 @@ async function faults(page) {
     );
 }
 
+/// And waits until the library has said what is in the selection.
+async function selectAll(page) {
+  await page.keyboard.press('i');
+  await page.waitForFunction(() => document.querySelector('.range-facts').textContent.includes('idle'));
+}
+
 const views = {
   welcome: { path: empty, show: async () => {} },
   entries: { path: recording.page, show: (page) => seek(page, 3.2) },
   facts: { path: recording.page, show: (page) => page.getByRole('tab', { name: 'Facts' }).click() },
   check: { path: recording.page, show: (page) => page.getByRole('tab', { name: 'Check' }).click() },
   layers: { path: recording.page, show: (page) => page.locator('#layers-button').click() },
+  more: { path: recording.page, show: (page) => page.locator('#more-button').click() },
+  selection: { path: recording.page, show: (page) => selectAll(page) },
+  adjusting: {
+    path: recording.page,
+    show: async (page) => {
+      await page.getByRole('tab', { name: 'Facts' }).click();
+      await page.getByRole('button', { name: 'Adjust…' }).click();
+    },
+  },
   help: { path: recording.page, show: (page) => page.locator('#help-button').click() },
   about: { path: recording.page, show: (page) => page.locator('#about-button').click() },
 };
@@ -91,6 +106,8 @@ for (const [size, text] of [
     assert.ok(width <= size[0], `${width} pixels`);
     assert.ok(stage > size[0] * (text > 100 ? 0.25 : 0.3), `the movie is ${stage} pixels wide`);
     assert.deepEqual(await page.evaluate(hiddenControls), []);
+    await selectAll(page);
+    assert.deepEqual(await page.evaluate(hiddenControls), [], 'with a selection');
     for (const id of ['frame-back', 'frame-forward', 'full-screen', 'clock-total'])
       assert.ok(await page.locator(`#${id}`).isVisible(), id);
     await close();
@@ -284,7 +301,7 @@ test('splitters tell their place, Escape closes the menu, keys move the lanes', 
 test('units and words are those of the reader', async () => {
   const { page, close } = await open(recording.page);
   await opened(page);
-  await page.keyboard.press('k');
+  await page.keyboard.press('t');
   await seek(page, 3.6);
   const labels = (await page.locator('.lane-labels').innerText()).replaceAll('\n', ' ');
   assert.match(labels, /CPU usage [\d.]+ %/);

@@ -1,9 +1,20 @@
-// Prints the table of Docs/viewer.md, measured from pictures of the screen: node figures.mjs, with the settings of the
-// tests.
+// Prints the tables of Docs/viewer.md, measured from pictures of the screen and from outside of the browser: node
+// figures.mjs, with the settings of the tests.
 
+import { statSync } from 'node:fs';
 import { test } from 'node:test';
 import { after, differencesOf, look, numberedRecording, settled, watch } from './numbered.mjs';
-import { open, opened, ready } from './support.mjs';
+import {
+  longestTask,
+  longRecording,
+  mostMemory,
+  open,
+  opened,
+  ready,
+  timeToFind,
+  watchingTasks,
+  wholeDay,
+} from './support.mjs';
 
 const rates = [
   ['10', '10'],
@@ -56,5 +67,35 @@ test('figures', async () => {
     ['---:', '---:', '---:', '---:', '---:', '---:'],
   ];
   for (const [name, rate] of rates) lines.push(await row(name, rate));
+  process.stdout.write(lines.map((cells) => `| ${cells.join(' | ')} |\n`).join(''));
+});
+
+const megabytes = (bytes) => `${(bytes / 1e6).toFixed(0)} MB`;
+const milliseconds = (time) => `${time.toFixed(0)} ms`;
+
+test('figures of eight hours', async () => {
+  const recording = longRecording('Day', wholeDay);
+  const { page, close } = await open(recording.page, { before: watchingTasks });
+  await opened(page);
+  const memory = await mostMemory();
+  const first = await page.evaluate(() => performance.getEntriesByName('zulm:first-picture')[0].startTime);
+  await page.waitForFunction(() => document.querySelector('.entries-status').textContent.includes('entries'));
+  await page.waitForTimeout(1000);
+  const opening = await longestTask(page);
+  const word = await timeToFind(page, 'terminal');
+  const digits = await timeToFind(page, '4321');
+  const finding = await longestTask(page);
+  await close();
+  const lines = [
+    ['a recording of eight hours', ''],
+    ['---', '---:'],
+    ['the page', megabytes(statSync(recording.page).size)],
+    ['first picture after', milliseconds(first)],
+    ['most memory until then', megabytes(memory * 1e6)],
+    ['a word is found in', milliseconds(word)],
+    ['digits are found in', milliseconds(digits)],
+    ['longest task while opening', opening < 50 ? 'below 50 ms' : milliseconds(opening)],
+    ['longest task while finding', finding < 50 ? 'below 50 ms' : milliseconds(finding)],
+  ];
   process.stdout.write(lines.map((cells) => `| ${cells.join(' | ')} |\n`).join(''));
 });

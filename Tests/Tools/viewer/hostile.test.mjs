@@ -216,7 +216,7 @@ test('cursor images that are larger than any cursor are never decoded', async ()
   await ready(page);
   await seek(page, 1.5);
   await page.waitForTimeout(300);
-  assert.deepEqual(await page.evaluate(() => decoded), [small.length]);
+  assert.deepEqual(await page.evaluate(() => [...new Set(decoded)]), [small.length]); // the table shows it as well
   const arrow = await page.evaluate(() => {
     const canvas = document.getElementById('overlay');
     const { data } = canvas.getContext('2d').getImageData(0, 0, canvas.width, canvas.height);

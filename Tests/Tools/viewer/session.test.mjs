@@ -135,7 +135,7 @@ test('captions are those of the tool, masked until the reader asks', async () =>
   const masked = await compare();
   assert.ok(!masked.includes('HALLO') && masked.includes('•'));
   assert.ok(!(await page.content()).includes('HALLO'));
-  await page.keyboard.press('k');
+  await page.keyboard.press('t');
   assert.ok((await compare('--show-keys')).includes('HALLO'));
   await seek(page, 2.3);
   assert.equal((await state(page)).caption, 'HA');

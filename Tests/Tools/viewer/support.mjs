@@ -5,7 +5,7 @@
 
 import assert from 'node:assert/strict';
 import { execFileSync, spawnSync } from 'node:child_process';
-import { mkdtempSync, rmSync, truncateSync, writeFileSync } from 'node:fs';
+import { mkdtempSync, readFileSync, rmSync, truncateSync, writeFileSync } from 'node:fs';
 import { createRequire } from 'node:module';
 import { tmpdir } from 'node:os';
 import { join } from 'node:path';
@@ -47,10 +47,24 @@ export function recordedSession() {
   return { movie: join(folder, 'Recording.mp4'), page: join(folder, 'Recording.html') };
 }
 
-/// An hour of metadata with that many cursor positions a second, and a movie of a picture a second.
-export function longRecording(name, rate) {
+/// A recording of an editor and a terminal that somebody uses, with its page beside it.
+export function recordedDesktop() {
+  const movie = join(folder, 'Desktop.mp4');
+  execFileSync('python3', [join(sources, 'Tests/Tools/record/real_desktop.py'), movie], {
+    stdio: ['ignore', 'ignore', 'inherit'],
+    env: { ...process.env, ZULM_RECORD: setting('ZULM_RECORD') },
+  });
+  zulm('view', 'Desktop.mp4', '-o', 'Desktop.html');
+  return { movie, page: join(folder, 'Desktop.html') };
+}
+
+/// What a long recording holds; `rate` is in cursor positions a second.
+export const wholeDay = { rate: 174, hours: 8, keys: 100_000, titles: 50_000 };
+
+/// Metadata of an hour, or as long as it says, and a movie of a picture every second, or every ten.
+export function longRecording(name, { rate, hours = 1, keys = 20_000, titles = 150 }) {
   const movie = join(folder, `${name}.mp4`);
-  const picture = ['-f', 'lavfi', '-i', 'color=c=0x202633:s=640x360:r=1', '-t', '3600', '-g', '30'];
+  const picture = ['-f', 'lavfi', '-i', `color=c=0x202633:s=640x360:r=${hours > 1 ? 0.1 : 1}`, '-t', String(hours * 3600), '-g', '30'];
   const parameters = [
     '-v',
     'error',
@@ -65,7 +79,7 @@ export function longRecording(name, rate) {
     movie,
   ];
   execFileSync('ffmpeg', parameters, { stdio: ['ignore', 'ignore', 'inherit'] });
-  execFileSync(setting('ZULM_LONG_RECORDING'), [movie, join(folder, name), String(rate)]);
+  execFileSync(setting('ZULM_LONG_RECORDING'), [movie, join(folder, name), ...[rate, hours, keys, titles].map(String)]);
   zulm('view', `${name}.mp4`, '-o', `${name}.html`);
   return { movie, page: join(folder, `${name}.html`) };
 }
@@ -86,11 +100,47 @@ export function hugeMovie(gigabytes) {
 
 /// The page that `zulm view` wrote, without its recording.
 export function emptyPage(text) {
-  return text.replace(/<script type="application\/json" id="zulm-recording">[^<]*<\/script>\n?/, '');
+  return text.replace(/<script type="[a-z/]*" id="zulm-(recording|metadata)">[^<]*<\/script>\n?/g, '');
 }
 
 let browser;
 after(() => browser?.close());
+
+/// The most memory that a process of a page has had so far, in megabytes.
+export async function mostMemory() {
+  const session = await browser.newBrowserCDPSession();
+  const { processInfo } = await session.send('SystemInfo.getProcessInfo');
+  await session.detach();
+  const pages = processInfo.filter(({ type }) => type === 'renderer');
+  const most = pages.map(({ id }) => Number(/VmHWM:\s+(\d+)/.exec(readFileSync(`/proc/${id}/status`, 'utf8'))[1]));
+  return (Math.max(...most) * 1024) / 1e6;
+}
+
+/// Keeps how long the page was busy at a time, in milliseconds.
+export const watchingTasks = () => {
+  globalThis.busy = [];
+  const watch = (list) => globalThis.busy.push(...list.getEntries().map(({ duration }) => duration));
+  new PerformanceObserver(watch).observe({ type: 'longtask', buffered: true });
+};
+
+/// The longest of them since it was asked before; below 50 they do not count.
+export function longestTask(page) {
+  return page.evaluate(() => Math.round(Math.max(0, ...globalThis.busy.splice(0))));
+}
+
+/// The milliseconds until the table shows what fits a filter.
+export async function timeToFind(page, words) {
+  const field = page.getByLabel('Filter entries');
+  await field.fill('');
+  await page.evaluate(() => (globalThis.asked = performance.now()));
+  await field.fill(words);
+  await page.waitForFunction(
+    () => / of [^…]*$/.test(document.querySelector('.entries-status').textContent),
+    null,
+    { timeout: 120_000, polling: 20 },
+  );
+  return page.evaluate(() => performance.now() - globalThis.asked);
+}
 
 /// A page that keeps what went wrong in it and what it asked for. `before` runs in it before its own script.
 export async function open(path, { size = [1280, 800], theme = 'dark', hash = '', before, ...more } = {}) {

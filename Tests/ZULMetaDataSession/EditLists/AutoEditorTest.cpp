@@ -41,8 +41,7 @@ TEST(AutoEditor, CountsChunksInTheTimebaseOfTheFile) {
     EXPECT_THAT(
         piecesOf(R"({"version": "1", "timebase": "30000/1001", "source": "", "chunks": [[30, 60, 1]]})", "a.v1"),
         ElementsAre("1001/1000-1001/500@1=1001/1000"));
-    EXPECT_THAT(piecesOfChunks("[0, 26, 1]", {}),
-                ElementsAre("a.json: it counts frames, and the frame rate is not known; name it"));
+    EXPECT_THAT(piecesOfChunks("[0, 26, 1]", {}), ElementsAre("a.json: it counts frames; name its frame rate"));
     for (const char* timebase : {"29.97", "0/1", "", "x", "30/0"})
         EXPECT_THAT(
             piecesOf(R"({"version": "1", "timebase": ")" + std::string(timebase) + R"(", "source": "", "chunks": []})",

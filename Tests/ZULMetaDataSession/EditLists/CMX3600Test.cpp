@@ -40,7 +40,7 @@ TEST(CMX3600, PlaysEventsInTheOrderOfTheEditedMovie) {
 TEST(CMX3600, NeedsAFrameRate) {
     const std::string event = "001 A V C 00:00:10:00 00:00:20:00 01:00:00:00 01:00:10:00\n";
     EXPECT_THAT(piecesOf(event, "a.edl"),
-                ElementsAre("a.edl: an edit decision list counts frames, and the frame rate is not known; name it"));
+                ElementsAre("a.edl: an edit decision list counts frames; name its frame rate"));
     EXPECT_THAT(piecesOfEvents("FCM: NON-DROP FRAME\n" + event, {24000, 1001}),
                 ElementsAre("1001/100-1001/50@1=1001/100"));
     for (const Rational& rate : {Rational(25, 2), Rational(0), Rational(-25), Rational(101), Rational(299, 10)})

@@ -33,7 +33,7 @@ interface Licence {
 
 const at = (path: string) => fileURLToPath(new URL(path, import.meta.url));
 
-/// Of what is compiled into the decoder: a line with its name and its licence, then the text.
+/// Returns the licences of what is compiled into the decoder: a line with its name and its licence, then the text.
 function licencesOfDecoder(): Licence[] {
   const texts = ['zulmetadata', 'json', 'fmt', 'emscripten', 'musl', 'llvm'].map((name) =>
     readFileSync(at(`licences/${name}.txt`), 'utf8'),
@@ -44,7 +44,8 @@ function licencesOfDecoder(): Licence[] {
   });
 }
 
-/// Of every package that is in the page and not only builds it, as the package itself has it.
+/// Returns the licence of every package that is in the page, as the package itself has it. Packages that only build the
+/// page are left out.
 function licencesOfPackages(): Licence[] {
   const lock = JSON.parse(readFileSync(at('package-lock.json'), 'utf8')) as {
     packages: Record<string, { version: string; license: string; dev?: boolean }>;

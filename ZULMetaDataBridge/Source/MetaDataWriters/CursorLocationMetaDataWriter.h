@@ -6,7 +6,7 @@
 
 namespace ZULMetaData {
 
-/// Writes where the cursor is, in pixels of the recorded display, many times a second.
+/// Writes where the cursor is, in units of the display, many times a second.
 class CursorLocationMetaDataWriter final : public CountedMetaDataWriter<CursorLocationKind> {
 public:
     using CountedMetaDataWriter::CountedMetaDataWriter;

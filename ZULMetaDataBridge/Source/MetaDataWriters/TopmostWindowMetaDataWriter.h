@@ -4,7 +4,7 @@
 
 namespace ZULMetaData {
 
-/// Writes where the window on top is, in pixels of the display.
+/// Writes where the window on top is, in units of the display.
 class TopmostWindowMetaDataWriter final : public ContinuousMetaDataWriter<TopmostWindowKind> {
 public:
     using ContinuousMetaDataWriter::ContinuousMetaDataWriter;

@@ -1,35 +1,59 @@
 // The page: a recording, a player, and everything that shows where they are.
 
+import { adjustmentIn, asRecorded, isSame, partsOfAdjustment, shifted, type Adjustment } from './adjust/adjustment';
+import { showAdjusting } from './adjust/dialog';
 import { Decoder } from './decoder/client';
-import { embeddedRecording, type EmbeddedRecording } from './decoder/embedded';
+import { embeddedRecording, type EmbeddedRecording, type PackedText } from './decoder/embedded';
 import { EntriesPane } from './entries/pane';
 import { showCheck, showFacts } from './facts/pane';
+import { InsightTables } from './insights/tables';
+import type { Range } from './lanes/axis';
+import { arrangeLanes } from './lanes/dialog';
 import { Timeline } from './lanes/timeline';
 import { assumption } from './model/checks';
 import { clock, shown } from './model/format';
+import { decimal } from './model/decimals';
+import { joined, type Joined } from './model/joining';
 import { markerAfter, markerBefore } from './model/markers';
 import { Session, type Decoded } from './model/session';
-import { timeInLink, linkTo } from './model/link';
+import { linkTo, linkToView, partsOf, rangeIn, rangeText, timeInLink, withParts } from './model/link';
+import { NotesPane } from './notes/pane';
+import { RangeBar } from './range/bar';
+import { Selection } from './range/selection';
+import { zoomStage } from './stage/handling';
 import { layers } from './stage/layers';
 import { Player } from './stage/player';
 import { Stage } from './stage/stage';
+import { afterIdle } from './transport/skipping';
 import { setUpAutomation } from './ui/automation';
 import { setUpControls, type Controls } from './ui/controls';
 import { ask, setUpDialogs } from './ui/dialogs';
+import { breath } from './ui/breath';
 import { announce, byId, setText } from './ui/dom';
 import { setUpDrop } from './ui/drop';
 import { placeIcons } from './ui/icons';
 import { setUpKeys } from './ui/keys';
 import { mark, measured } from './ui/marks';
 import type { Page } from './ui/page';
+import { saveBlob } from './ui/save';
 import { setUpSplitters } from './ui/splitter';
 import { setUpTabs, showTab } from './ui/tabs';
 import { setUpTheme } from './ui/theme';
 
 export class App implements Page {
   readonly player = new Player(byId<HTMLVideoElement>('movie'));
-  readonly stage = new Stage(this.player);
   readonly decoder = new Decoder();
+  readonly selection = new Selection();
+  skipsIdle = false;
+  private readonly insights = new InsightTables({
+    ask: async (name, parameters) => (await this.decoder.insights({ name, parameters }))[0]!,
+    onLoaded: () => this.requestFrame(),
+    onProblem: (text) => this.complain(text),
+  });
+  readonly stage = new Stage(this.player, this.insights);
+  /// As it is recorded, and how the reader says that it belongs to the movie.
+  private decoded: Decoded | undefined;
+  private adjustment = asRecorded;
   session: Session | undefined;
   private movieUrl = '';
   private movieName = '';
@@ -38,20 +62,31 @@ export class App implements Page {
   private shownMovie = '';
   private drawnTime = -1;
   private opened = 0;
+  /// The recording whose entries are shown as the address says.
+  private linked: Session | undefined;
   finished = 0;
   private controls!: Controls;
   private readonly timeline: Timeline;
   private readonly entries: EntriesPane;
+  private readonly notes: NotesPane;
+  private readonly usualLayers = layersOn();
+  private readonly rangeBar: RangeBar;
 
   constructor() {
     const showsKeys = () => this.stage.showsKeys;
     this.timeline = new Timeline({
       showsKeys,
       region: () => this.stage.placement.region,
+      notes: () => this.notes.all,
       onSeek: (time) => this.seek(time),
-      onRange: ({ from, to }) => {
-        this.stage.setHeatRange(from, to);
-        this.requestFrame();
+      onRange: () => {
+        this.rangeChanged();
+        this.writeLink();
+      },
+      onSelect: (one, other) => this.selection.select(one, other),
+      onExtend: (time) => {
+        this.selection.extend(this.player.time, time);
+        this.seek(time);
       },
     });
     this.entries = new EntriesPane({
@@ -59,7 +94,29 @@ export class App implements Page {
       onSeek: (time) => this.seek(time),
       onSave: () => void this.save(),
       onProblem: (text) => this.complain(text),
+      onChange: () => this.writeLink(),
     });
+    this.notes = new NotesPane({
+      time: () => this.player.time,
+      onSeek: (time) => this.seek(time),
+      onProblem: (text) => this.complain(text),
+      onChange: () => {
+        this.timeline.refreshLanes();
+        this.requestFrame();
+      },
+    });
+    this.rangeBar = new RangeBar(this.selection, {
+      insights: (range) => this.insightsIn(range),
+      movieName: () => this.fileName(),
+      link: () => location.href.replace(/#.*/, '') + this.link(),
+      onZoom: (range) => this.timeline.setRange(range),
+      onFilter: ({ from, to }) => {
+        showTab('tab-entries');
+        this.entries.showBetween(from, to);
+      },
+      onProblem: (text) => this.complain(text),
+    });
+    this.selection.onChange = () => this.selectionChanged();
   }
 
   start(): void {
@@ -69,7 +126,7 @@ export class App implements Page {
     setUpTabs(() => this.requestFrame());
     setUpSplitters();
     setUpDialogs();
-    setUpDrop((file) => void this.openFile(file));
+    setUpDrop((files) => void this.openFiles(files));
     this.controls = setUpControls(this);
     setUpKeys(this);
     setUpAutomation(this);
@@ -78,9 +135,13 @@ export class App implements Page {
       this.requestFrame();
     });
     byId('notice-close').addEventListener('click', () => void (byId('notice').hidden = true));
-    window.addEventListener('hashchange', () => this.followLink());
+    window.addEventListener('hashchange', () => {
+      this.followLink();
+      this.followLinkToEntries();
+    });
     this.player.onChange = () => this.playerChanged();
     this.player.onPicture = () => this.pictureChanged();
+    this.player.skip = (time) => (this.skipsIdle ? afterIdle(this.session?.idle ?? [], time) : undefined);
     this.stage.images.onDecoded = () => this.requestFrame();
     this.openEmbedded();
   }
@@ -105,18 +166,27 @@ export class App implements Page {
     }));
   }
 
-  async openFile(file: File): Promise<void> {
-    const url = URL.createObjectURL(file);
-    await this.open(file, file.name, (decoded) => {
-      this.setMovie(url, file.name);
+  /// One recording: a movie, or stream files, or both.
+  async openFiles(files: File[]): Promise<void> {
+    let recording: Joined;
+    try {
+      recording = joined(files);
+    } catch (error) {
+      ++this.finished;
+      return this.complain(`The files cannot be opened: ${wordsOf(error)}.`);
+    }
+    const { contents, name, movie } = recording;
+    const url = movie ? URL.createObjectURL(movie) : null;
+    await this.open(contents, name, (decoded) => {
+      this.setMovie(url, movie?.name ?? '');
       history.replaceState(null, '', linkTo(0)); // the address told a time of the recording before
       return decoded;
     });
-    if (this.movieUrl !== url) URL.revokeObjectURL(url);
+    if (url !== null && this.movieUrl !== url) URL.revokeObjectURL(url);
   }
 
   /// What is open stays where the new one cannot be read.
-  private async open(source: Blob | string, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
+  private async open(source: Blob | PackedText, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
     const opening = ++this.opened;
     document.body.classList.add('is-busy');
     setText(byId('welcome-title'), `Opening ${shown(name)}…`);
@@ -127,7 +197,15 @@ export class App implements Page {
       mark('zulm:decoded');
       if (decoded.streams.length === 0 && decoded.hidden.length === 0) throw new Error(whyNothing(decoded));
       byId('notice').hidden = true;
-      this.show(new Session(complete(decoded)));
+      await breath(); // each step by itself, so that the page goes on
+      if (opening !== this.opened) return;
+      const completed = complete(decoded);
+      const adjustment = adjustmentIn(location.hash);
+      const session = sessionOf(completed, adjustment);
+      await breath();
+      if (opening !== this.opened) return;
+      [this.decoded, this.adjustment] = [completed, adjustment];
+      this.show(session);
       this.decoder.keep(id);
       if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
     } catch (error) {
@@ -158,19 +236,66 @@ export class App implements Page {
     setText(byId('recording-name'), shown(session.name));
     const canHavePictures = session.container !== 'stream';
     this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration, session.movieDuration === undefined);
-    this.stage.show(session);
-    this.timeline.show(session, this.player.duration);
+    this.notes.show(session);
+    this.selection.start(this.player.duration);
+    this.showSession(session);
+    this.stage.zoom.reset();
+    this.selectionChanged();
     this.followLink();
     this.frame();
     mark('zulm:first-picture');
     setTimeout(() => this.showDetails(session));
   }
 
+  private adjustedSession(): Session {
+    return sessionOf(this.decoded!, this.adjustment);
+  }
+
+  private showSession(session: Session): void {
+    this.session = session;
+    this.insights.start(session.duration, this.adjustment.offset);
+    this.stage.show(session);
+    this.timeline.show(session, this.player.duration);
+  }
+
+  /// The movie goes on, and only what belongs to it changes.
+  private adjust(adjustment: Adjustment): void {
+    if (!this.decoded || isSame(adjustment, this.adjustment)) return;
+    this.adjustment = adjustment;
+    const session = this.adjustedSession();
+    this.player.setLength(session.duration, session.movieDuration === undefined);
+    this.showSession(session);
+    this.selection.setDuration(this.player.duration);
+    this.rangeBar.forget();
+    this.selectionChanged();
+    this.showDetails(session);
+    this.writeLink();
+  }
+
+  /// Shows what is open over another movie.
+  private useMovie(movie: File): void {
+    if (!this.decoded) return;
+    this.setMovie(URL.createObjectURL(movie), movie.name);
+    const { duration: _, ...decoded } = this.decoded;
+    this.decoded = { ...decoded, duration: undefined };
+    const session = this.adjustedSession();
+    this.player.load(this.movieUrl, session.duration, true);
+    this.showSession(session);
+    this.showDetails(session);
+  }
+
   /// What may come after the first picture.
   private showDetails(session: Session): void {
     if (session !== this.session) return;
     this.entries.show(session);
-    showFacts(session, this.player.duration);
+    this.followLinkToEntries();
+    showFacts(session, this.player.duration, this.adjustment, {
+      onAdjust: () =>
+        showAdjusting(this.adjustment, {
+          onAdjust: (adjustment) => this.adjust(adjustment),
+          onMovie: (movie) => this.useMovie(movie),
+        }),
+    });
     showCheck(session, this.player.size);
     this.requestFrame();
     void this.stage.images.prepare(session.appearances);
@@ -216,15 +341,51 @@ export class App implements Page {
     this.timeline.pan(part);
   }
 
+  /// Parts that the address lacks change nothing.
   private followLink(): void {
+    if (!this.session) return;
+    const parts = partsOf(location.hash);
+    if (parts.has('offset') || parts.has('region')) this.adjust(adjustmentIn(location.hash));
+    const zoom = rangeIn(parts.get('zoom'));
+    if (zoom) this.timeline.setRange(zoom);
     const time = timeInLink(location.hash);
-    if (time !== undefined && this.session && Math.abs(time - this.player.time) > 0.0005) this.seek(time);
+    if (time !== undefined && Math.abs(time - this.player.time) > 0.0005) this.seek(time);
+    const wanted = parts.get('layers')?.split(',');
+    if (wanted) for (const layer of layers) layer.isOn = wanted.includes(layer.id);
+    const range = rangeIn(parts.get('range'));
+    if (range && parts.get('range') !== this.rangeInLink()) this.selection.select(range.from, range.to);
+    this.controls.showState();
+    this.requestFrame();
   }
 
-  /// The address tells the time, but not sixty times a second: browsers allow few changes.
+  private rangeInLink(): string | undefined {
+    const { range } = this.selection;
+    return range && rangeText(range);
+  }
+
+  /// The address of what is shown, after "#".
+  private link(): string {
+    const on = layersOn();
+    const others = withParts(location.hash, [['range', this.rangeInLink()], ...partsOfAdjustment(this.adjustment)]);
+    return linkToView(others, {
+      time: this.player.time,
+      zoom: this.timeline.zoomed,
+      stream: this.entries.chosenStream,
+      filter: this.entries.filterText,
+      layers: on.join() === this.usualLayers.join() ? undefined : on,
+    });
+  }
+
+  private followLinkToEntries(): void {
+    const parts = partsOf(location.hash);
+    this.entries.look(parts.get('stream'), parts.get('filter'));
+    this.linked = this.session;
+  }
+
+  /// The address tells what is shown, but not sixty times a second: browsers allow few changes.
   private writeLink = debounced(() => {
-    if (!this.session || this.player.playing) return;
-    const link = linkTo(this.player.time);
+    if (!this.session || this.linked !== this.session || this.player.playing) return;
+    const link = this.link();
     if (link !== location.hash) history.replaceState(null, '', link);
   }, 300);
 
@@ -236,6 +397,7 @@ export class App implements Page {
     layer.isOn = !layer.isOn;
     this.controls.showState();
     announce(`${layer.name} ${layer.isOn ? 'shown' : 'hidden'}`);
+    this.writeLink();
     this.requestFrame();
   }
 
@@ -248,14 +410,88 @@ export class App implements Page {
     this.requestFrame();
   }
 
+  arrangeLanes(): void {
+    arrangeLanes(this.timeline);
+  }
+
+  writeNote(): void {
+    showTab('tab-notes');
+    this.notes.focusField();
+  }
+
   findEntries(): void {
     showTab('tab-entries');
     this.entries.focusFilter();
   }
 
+  // The selection
+
+  private selectionChanged(): void {
+    const { range, loops } = this.selection;
+    this.player.loop = loops ? range : undefined;
+    this.timeline.showSelection(range);
+    this.rangeBar.show();
+    this.rangeChanged();
+    this.writeLink();
+  }
+
+  /// The heat map tells of the selection, or of what the lanes show.
+  private rangeChanged(): void {
+    const { range, hasHeat } = this.selection;
+    const { from, to } = hasHeat && range ? range : this.timeline.range;
+    const heat = layers.find(({ id }) => id === 'heat')!;
+    if (hasHeat && !heat.isOn) this.switchLayer('heat');
+    this.stage.setHeatRange(from, to);
+    this.requestFrame();
+  }
+
+  /// The range is one of the movie.
+  private insightsIn({ from, to }: Range): ReturnType<Decoder['insights']> {
+    const { offset } = this.adjustment;
+    const parameters = { start: from - offset, end: to - offset };
+    return this.decoder.insights({ name: 'activity', parameters }, { name: 'applications', parameters });
+  }
+
+  selectSome(): void {
+    this.timeline.selectSome();
+  }
+
+  switchLoop(): void {
+    this.rangeBar.switchLoop();
+  }
+
+  // The movie
+
+  switchSkipping(): void {
+    this.skipsIdle = !this.skipsIdle;
+    this.controls.showState();
+    announce(this.skipsIdle ? 'Idle times are skipped' : 'Idle times are played');
+  }
+
+  zoomMovie(factor: number): void {
+    zoomStage(this.stage.zoom, factor);
+  }
+
+  /// The name of the movie's file.
+  private fileName(): string {
+    const [name = ''] = this.movieName.split(/[\\/]/).slice(-1);
+    return this.movieUrl.startsWith('blob:') || !name ? name || this.session?.name || 'recording' : decodedName(name);
+  }
+
+  saveStill(): void {
+    const name = `${this.session?.name ?? 'recording'} ${decimal(this.player.time)}.png`;
+    this.stage.still().then(
+      (picture) => saveBlob(name, picture),
+      (error) => this.complain(`The picture could not be saved: ${stillProblem(error)}.`),
+    );
+  }
+
   private playerChanged(): void {
     const { session, player } = this;
-    if (session) this.timeline.setDuration(player.duration);
+    if (session) {
+      this.timeline.setDuration(player.duration);
+      this.selection.setDuration(player.duration);
+    }
     this.stage.lay();
     if (session && player.movie !== this.shownMovie) {
       this.shownMovie = player.movie;
@@ -335,17 +571,31 @@ export class App implements Page {
       if (!agrees) return;
     }
     try {
-      const url = URL.createObjectURL(new Blob([await this.decoder.dump()], { type: 'application/json' }));
-      const link = Object.assign(document.createElement('a'), {
-        href: url,
-        download: `${this.session?.name ?? 'recording'}.json`,
-      });
-      link.click();
-      setTimeout(() => URL.revokeObjectURL(url), 10_000);
+      const contents = new Blob([await this.decoder.dump()], { type: 'application/json' });
+      saveBlob(`${this.session?.name ?? 'recording'}.json`, contents);
     } catch (error) {
       this.complain(`The entries could not be saved: ${wordsOf(error)}.`);
     }
   }
+}
+
+function sessionOf(decoded: Decoded, { offset, region }: Adjustment): Session {
+  return new Session(shifted(decoded, offset), region);
+}
+
+/// A page writes names in addresses with percent signs.
+function decodedName(name: string): string {
+  try {
+    return decodeURIComponent(name);
+  } catch {
+    return name;
+  }
+}
+
+function stillProblem(error: unknown): string {
+  return error instanceof DOMException && error.name === 'SecurityError'
+    ? 'the browser does not let a page read a movie beside it. Choose the movie under Facts, Adjust, or drop it on the page, and save the picture then'
+    : wordsOf(error);
 }
 
 /// Without the name of the file in front, where the sentence has it already. A clause about the file gets its subject.
@@ -353,6 +603,10 @@ function wordsOf(error: unknown, name = ''): string {
   const words = (error instanceof Error ? error.message : String(error)).replace(/\.$/, '');
   const clause = name && words.startsWith(`${name}: `) ? words.slice(name.length + 2) : words;
   return /^(begins|is) /.test(clause) ? `it ${clause}` : clause;
+}
+
+function layersOn(): string[] {
+  return layers.filter(({ isOn }) => isOn).map(({ id }) => id);
 }
 
 const firstAtoms = /^(ftyp|mdat|moov|free|skip|wide|RIFF)$/;

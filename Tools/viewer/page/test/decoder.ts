@@ -1,4 +1,4 @@
-// Stands in for the decoder where it has not been built: every file is the synthetic recording.
+// Stands in for the decoder if that has not been built: every file is the synthetic recording.
 
 import type { Column, Entries, StreamSummary, Table } from '../../../../Bindings/JavaScript/zulmetadata';
 import { syntheticEntries } from './synthetic';

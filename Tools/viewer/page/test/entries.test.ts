@@ -3,7 +3,10 @@ import { test } from 'node:test';
 import { asCSV, asJSON } from '../src/entries/copy';
 import { filterRows, testOf } from '../src/entries/filter';
 import { AllRows, StreamRows, type Rows } from '../src/entries/rows';
+import { orderOf, picked, placesOf } from '../src/entries/sorting';
+import { mergedOf } from '../src/model/merged';
 import { Track } from '../src/model/track';
+import { randomNumbers } from './synthetic';
 
 const keys = new Track({
   kind: 'keyboardAction',
@@ -105,4 +108,54 @@ test('copies of several streams have the columns of all', () => {
   const lines = asCSV(rows, [0, 1]).split('\n');
   assert.equal(lines[0], 'kind,x,y,timestamp,characterCode,characterString,eventFlagsCode,eventFlagsString');
   assert.equal(lines[1], 'cursorLocation,100,5,1,,,,');
+});
+
+test('a word is found in what is shown, however it is looked for', async () => {
+  const random = randomNumbers(5);
+  const times = Float64Array.from({ length: 400 }, (_, i) => i * 27.3 + random());
+  const numbers = new Track({
+    kind: 'cursorLocation',
+    time: times,
+    columns: {
+      x: Int32Array.from(times, () => Math.round(random() * 4000 - 1000)),
+      opacity: Float64Array.from(times, () => random()),
+      title: Array.from(times, (_, i) => `Window ${i % 7}`),
+    },
+  });
+  for (const rows of [new StreamRows(numbers, () => true), new AllRows([keys, numbers], () => true)])
+    for (const word of ['12', '-9', '0.5', '1:2', ':07.', 'window 3', 'x', 'x=1', '.3', 'cursor', 'e', '-']) {
+      const cells = (row: number) => rows.columns.map((_, column) => rows.cell(row, column).toLowerCase());
+      const expected = Array.from({ length: rows.count }, (_, row) => row).filter((row) =>
+        cells(row).some((cell) => cell.includes(word)),
+      );
+      const test = rows.wordTest(word);
+      const actual = Array.from({ length: rows.count }, (_, row) => row).filter(test);
+      assert.deepEqual(actual, expected, word);
+    }
+});
+
+test('rows that are equal keep their order, and what is no number comes last', () => {
+  const values = [3, 1, Number.NaN, -2, 1, -0.5, 0, -0, Infinity, -Infinity, 3];
+  const sorted = (isDescending: boolean) => [...orderOf(Float64Array.from(values), isDescending)];
+  assert.deepEqual(sorted(false), [9, 3, 5, 6, 7, 1, 4, 0, 10, 8, 2]);
+  assert.deepEqual(sorted(true), [8, 0, 10, 1, 4, 6, 7, 5, 3, 9, 2]);
+  const random = randomNumbers(9);
+  const many = Float64Array.from({ length: 5000 }, () => Math.floor(random() * 2e9 - 1e9) / (random() < 0.5 ? 1 : 1e6));
+  const order = orderOf(many.slice(), false);
+  for (let i = 1; i < order.length; ++i) assert.ok(many[order[i - 1]!]! <= many[order[i]!]!);
+  const matches = Uint32Array.of(1, 4, 7);
+  assert.deepEqual([...picked(Uint32Array.of(7, 3, 4, 1, 0, 2, 5, 6), matches)], [7, 4, 1]);
+  assert.deepEqual([...placesOf(Uint32Array.of(2, 0), 4)], [1, -1, 0, -1]);
+});
+
+test('all streams by time are merged as one by one', () => {
+  const random = randomNumbers(4);
+  const track = (kind: string, length: number, step: number) =>
+    new Track({ kind, time: Float64Array.from({ length }, () => Math.floor(random() * step)), columns: {} });
+  const tracks = [track('a', 30, 20), track('b', 0, 1), track('c', 50, 20), track('d', 3, 9)];
+  const { stream, row } = mergedOf(tracks);
+  const all = tracks.flatMap((one, k) => Array.from(one.times, (time, i) => ({ time, k, row: one.row(i) })));
+  all.sort((a, b) => a.time - b.time || a.k - b.k);
+  assert.deepEqual([...stream], all.map(({ k }) => k));
+  assert.deepEqual([...row], all.map(({ row }) => row));
 });

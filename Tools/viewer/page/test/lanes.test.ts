@@ -1,9 +1,11 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
 import { clampedRange, tickDigits, ticks, tickStep, zoomed } from '../src/lanes/axis';
-import { Extremes } from '../src/lanes/extremes';
+import { drawBands, LaneCanvas } from '../src/lanes/lane';
+import { Extremes } from '../src/model/extremes';
 import { speedOf } from '../src/model/speed';
 import { Track } from '../src/model/track';
+import type { Palette } from '../src/ui/palette';
 import { randomNumbers, syntheticEntries } from './synthetic';
 
 test('the extremes of any run are those of its values', () => {
@@ -38,6 +40,24 @@ test('zooming keeps the time below the pointer where it is', () => {
   const near = zoomed({ from: 4, to: 4.06 }, 4.03, 0.01, 20);
   assert.ok(Math.abs(near.to - near.from - 0.05) < 1e-9);
   assert.deepEqual(zoomed({ from: 5, to: 15 }, 10, 100, 20), { from: 0, to: 20 });
+});
+
+/// Draws bands on ten seconds of a thousand pixels, and returns which of them, by their colours.
+function drawnBands(times: number[]): string[] {
+  const drawn: string[] = [];
+  const context = { fillStyle: '', beginPath() {}, roundRect() {}, stroke() {}, fill: () => drawn.push(context.fillStyle) };
+  const canvas = new LaneCanvas(context as never, {} as Palette, { from: 0, to: 10 }, 1000, 0, 20);
+  drawBands(canvas, Float64Array.from(times), (index) => {
+    const [start, end] = [times[index]!, times[index + 1] ?? 10];
+    return { start, end, text: '', colour: String(index), edge: '' };
+  });
+  return drawn;
+}
+
+test('a band that holds for long is drawn, however soon it follows on a short one', () => {
+  assert.deepEqual(drawnBands([0, 3, 3.001, 6]), ['0', '1', '2', '3']);
+  assert.deepEqual(drawnBands([0, 3, 3.001, 3.002, 3.003, 6]), ['0', '1', '4', '5']);
+  assert.ok(drawnBands(Array.from({ length: 100_000 }, (_, i) => i / 10_000)).length <= 1000);
 });
 
 function speedAlong(time: number[], x: number[]) {

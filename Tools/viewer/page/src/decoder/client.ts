@@ -1,7 +1,11 @@
 // The page's side of the decoder.
 
+import type { Table } from '#decoder';
 import type { Decoded } from '../model/session';
-import type { Reply, Request } from './protocol';
+import type { PackedText } from './embedded';
+import { piecesOf } from './packed';
+import type { Insight, Reply, Request } from './protocol';
+import { unwrapped } from './wire';
 import DecoderWorker from './worker?worker&inline';
 
 type Wish = Request extends infer One ? (One extends Request ? Omit<One, 'id'> : never) : never;
@@ -19,11 +23,13 @@ export class Decoder {
     this.running();
   }
 
-  /// A file is read in slices, as far as needed; a text is the file itself in base64, whose reports are known.
-  async open(source: Blob | string, name: string): Promise<{ id: number; decoded: Decoded; problems: string[] }> {
-    const reply = await this.ask({ type: 'open', source, name, reports: typeof source !== 'string' });
+  /// A file is read in slices, as far as needed; a text holds the file itself, whose reports are known.
+  async open(source: Blob | PackedText, name: string): Promise<{ id: number; decoded: Decoded; problems: string[] }> {
+    const isFile = source instanceof Blob;
+    if (!isFile) for (const text of piecesOf(source.text)) this.running().postMessage({ type: 'piece', id: 0, text });
+    const reply = await this.ask({ type: 'open', source: isFile ? source : source.size, name, reports: isFile });
     if (reply.type !== 'opened') throw new DecoderError('the decoder answered something else');
-    return reply;
+    return { ...reply, decoded: unwrapped(reply.decoded) };
   }
 
   /// What was opened under this number is what the page shows from now on; without one it stays what it was. Frees
@@ -38,6 +44,13 @@ export class Decoder {
     const reply = await this.ask({ type: 'dump', opened: this.kept });
     if (reply.type !== 'dumped') throw new DecoderError('the decoder answered something else');
     return reply.text;
+  }
+
+  /// What the library computes from what is kept.
+  async insights(...asked: Insight[]): Promise<Table[]> {
+    const reply = await this.ask({ type: 'insights', opened: this.kept, asked });
+    if (reply.type !== 'computed') throw new DecoderError('the decoder answered something else');
+    return reply.tables;
   }
 
   private ask(wish: Wish): Promise<Reply> {

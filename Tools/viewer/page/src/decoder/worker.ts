@@ -3,22 +3,22 @@
 import { Recording, ZulmError, type Entries } from '#decoder';
 import { shortestIdle } from '../model/idle';
 import type { Decoded } from '../model/session';
+import { prepare } from '../model/prepared';
 import { Track } from '../model/track';
+import { PackedFile } from './packed';
 import type { Reply, Request } from './protocol';
+import { buffersIn, wrapped } from './wire';
 
-const recordings = new Map<number, Recording>();
+/// What was opened can be opened again. In between none of its memory is taken.
+type Reopen = () => Promise<Recording>;
+
+const recordings = new Map<number, Reopen>();
+let packed = new PackedFile();
 
 /// In words for a person.
 function wordsOf(error: unknown): string {
   if (error instanceof ZulmError) return error.message;
   return `the decoder stopped (${error instanceof Error ? error.message : String(error)})`;
-}
-
-function bytesOf(base64: string): Uint8Array {
-  const text = atob(base64);
-  const bytes = new Uint8Array(text.length);
-  for (let i = 0; i < text.length; ++i) bytes[i] = text.charCodeAt(i);
-  return bytes;
 }
 
 function decode(opened: Recording, name: string, reports: boolean): { decoded: Decoded; problems: string[] } {
@@ -48,7 +48,7 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
     stream: { ...stream },
     entries: stream.known ? attempt(`hidden ${stream.kind}`, () => opened.hiddenEntries(index)) : undefined,
   }));
-  const decoded = {
+  const decoded: Decoded = {
     name,
     container: opened.container,
     duration: opened.duration,
@@ -65,43 +65,77 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
   return { decoded, problems };
 }
 
-/// What can be handed over instead of copied.
-function transferable({ entries, keys, hidden }: Decoded): ArrayBuffer[] {
-  const buffers = new Set<ArrayBuffer>();
-  const all = [...entries, ...Object.values(keys ?? {}), ...hidden.flatMap(({ entries }) => entries ?? [])];
-  for (const { time, columns } of all)
-    for (const column of [time, ...Object.values(columns)])
-      if (ArrayBuffer.isView(column) && column.buffer instanceof ArrayBuffer) buffers.add(column.buffer);
-  return [...buffers];
+/// What was asked something after it was opened. It stays open, since more questions follow.
+let asked: { id: number; recording: Recording } | undefined;
+
+function closeAsked(): void {
+  asked?.recording.close();
+  asked = undefined;
 }
 
 function keep(id: number): void {
-  for (const [other, recording] of recordings) {
-    if (other === id) continue;
-    recording.close();
-    recordings.delete(other);
+  for (const other of recordings.keys()) if (other !== id) recordings.delete(other);
+  if (asked?.id !== id) closeAsked();
+}
+
+function reopening(source: Blob | number, name: string): Reopen {
+  if (source instanceof Blob) return () => Recording.open(source, name);
+  const file = packed;
+  packed = new PackedFile();
+  return async () => Recording.open(await file.unpacked(source), name);
+}
+
+function opened(id: number): Promise<Recording> {
+  const reopen = recordings.get(id);
+  if (!reopen) throw new ZulmError('the recording has to be opened again');
+  return reopen();
+}
+
+/// Asks what was opened under this number. What has failed is opened anew for the next question.
+async function using<Result>(id: number, use: (recording: Recording) => Result): Promise<Result> {
+  if (asked?.id !== id) {
+    const recording = await opened(id);
+    closeAsked();
+    asked = { id, recording };
+  }
+  try {
+    return use(asked.recording);
+  } catch (error) {
+    closeAsked();
+    throw error;
   }
 }
 
-async function answer(request: Request): Promise<[Reply, ArrayBuffer[]]> {
+/// Closes it before the rest is worked out, which takes memory too.
+async function open(id: number, name: string, reports: boolean): Promise<{ decoded: Decoded; problems: string[] }> {
+  const recording = await opened(id);
+  const { decoded, problems } = decode(recording, name, reports);
+  recording.close();
+  decoded.prepared = prepare(decoded.entries.map((entries) => new Track(entries)));
+  return { decoded: wrapped(decoded), problems };
+}
+
+async function answer(request: Exclude<Request, { type: 'piece' }>): Promise<[Reply, ArrayBuffer[]]> {
   const { id } = request;
   if (request.type === 'keep') {
     keep(request.opened);
     return [{ id, type: 'kept' }, []];
   }
-  if (request.type === 'dump') {
-    const recording = recordings.get(request.opened);
-    if (!recording) throw new ZulmError('the recording has to be opened again');
-    return [{ id, type: 'dumped', text: recording.dump() }, []];
+  if (request.type === 'dump')
+    return [{ id, type: 'dumped', text: await using(request.opened, (recording) => recording.dump()) }, []];
+  if (request.type === 'insights') {
+    const { opened, asked } = request;
+    const compute = (recording: Recording) => asked.map(({ name, parameters }) => recording.insights(name, parameters));
+    return [{ id, type: 'computed', tables: await using(opened, compute) }, []];
   }
   const { source, name, reports } = request;
-  const recording = await Recording.open(typeof source === 'string' ? bytesOf(source) : source, name);
-  recordings.set(id, recording);
-  const { decoded, problems } = decode(recording, name, reports);
-  return [{ id, type: 'opened', decoded, problems }, transferable(decoded)];
+  recordings.set(id, reopening(source, name));
+  const result = await open(id, name, reports);
+  return [{ id, type: 'opened', ...result }, [...buffersIn(result.decoded)]];
 }
 
 self.onmessage = async ({ data }: MessageEvent<Request>) => {
+  if (data.type === 'piece') return packed.take(data.text);
   try {
     const [reply, buffers] = await answer(data);
     self.postMessage(reply, { transfer: buffers });

@@ -1,6 +1,8 @@
 // Which rows a reader looks for: words, and comparisons such as x>800 or action=left.
 
+import { breath } from '../ui/breath';
 import type { Rows } from './rows';
+import type { RowTest } from './words';
 
 type Test = (rows: Rows, row: number) => boolean;
 
@@ -27,10 +29,11 @@ function comparing(name: string, operator: string, wanted: string): Test {
 }
 
 function containing(word: string): Test {
+  let asked: Rows | undefined;
+  let test: RowTest | undefined;
   return (rows, row) => {
-    for (let column = 0; column < rows.columns.length; ++column)
-      if (rows.cell(row, column).toLowerCase().includes(word)) return true;
-    return false;
+    if (rows !== asked || !test) [asked, test] = [rows, rows.wordTest(word)];
+    return test(row);
   };
 }
 
@@ -48,7 +51,8 @@ export function testOf(query: string): Test | null {
   return tests.length === 0 ? null : (rows, row) => tests.every((test) => test(rows, row));
 }
 
-const slice = 8; // milliseconds at a time, so that everything else goes on
+const slice = 12; // milliseconds at a time, so that everything else goes on
+const news = 150; // milliseconds from one report to the next
 
 /// Calls `found` with what is known so far, at last with all of it. Ends early once `isObsolete` says so.
 export async function filterRows(
@@ -59,6 +63,7 @@ export async function filterRows(
 ): Promise<void> {
   let matches = new Uint32Array(1024);
   let used = 0;
+  let reported = -Infinity;
   for (let row = 0; row < rows.count;) {
     const end = performance.now() + slice;
     while (row < rows.count && performance.now() < end)
@@ -67,8 +72,12 @@ export async function filterRows(
         if (used === matches.length) matches = grown(matches);
         matches[used++] = row;
       }
-    found(matches.slice(0, used), row >= rows.count);
-    if (row < rows.count) await new Promise((resolve) => setTimeout(resolve));
+    const isDone = row >= rows.count;
+    if (isDone || performance.now() - reported > news) {
+      found(matches.slice(0, used), isDone);
+      reported = performance.now();
+    }
+    if (!isDone) await breath();
     if (isObsolete()) return;
   }
   if (rows.count === 0) found(matches.slice(0, 0), true);

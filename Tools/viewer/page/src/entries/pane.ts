@@ -8,6 +8,7 @@ import { setIcon } from '../ui/icons';
 import { asCSV, asJSON, copyable, copyText } from './copy';
 import { filterRows, testOf } from './filter';
 import { AllRows, StreamRows, type Rows } from './rows';
+import { Sorter, type SortOrder } from './sorter';
 import { Table } from './table';
 
 export interface EntriesEvents {
@@ -15,6 +16,8 @@ export interface EntriesEvents {
   onSeek: (time: number) => void;
   onSave: () => void;
   onProblem: (text: string) => void;
+  /// Another stream or filter was chosen.
+  onChange: () => void;
 }
 
 const mostCopied = 500_000;
@@ -27,6 +30,9 @@ export class EntriesPane {
   private isDone = true;
   private search = 0;
   private time = -1;
+  private order: SortOrder | undefined;
+  private isSorting = false;
+  private readonly sorter = new Sorter();
   private readonly table = new Table();
   private readonly stream = make('select', { 'aria-label': 'Stream', class: 'select' });
   private readonly query = make('input', {
@@ -61,7 +67,10 @@ export class EntriesPane {
       this.table.element,
     );
     this.stream.addEventListener('change', () => this.choose(this.stream.value));
-    this.query.addEventListener('input', () => this.filter());
+    this.query.addEventListener('input', () => {
+      this.filter();
+      this.events.onChange();
+    });
     this.query.addEventListener('keydown', (event) => {
       if (event.key !== 'Enter') return;
       event.preventDefault();
@@ -69,6 +78,7 @@ export class EntriesPane {
     });
     this.table.onActivate = (row) => this.go(row);
     this.table.onSelect = () => this.showStatus();
+    this.table.onSort = (column) => void this.sort(column);
     this.table.element.addEventListener('copy', (event) => this.copyHere(event));
   }
 
@@ -103,9 +113,32 @@ export class EntriesPane {
     this.choose('');
   }
 
+  /// Empty for all streams.
+  get chosenStream(): string {
+    return this.stream.value;
+  }
+
+  get filterText(): string {
+    return this.query.value;
+  }
+
+  /// Shows the entries of a stream that fit a filter, each only if it is given. A stream that is not there is none.
+  look(stream: string | undefined, filter: string | undefined): void {
+    if (filter !== undefined) this.query.value = filter;
+    const isThere = [...this.stream.options].some(({ value }) => value === stream);
+    if (stream !== undefined && isThere) this.stream.value = stream;
+    if (filter !== undefined || (stream !== undefined && isThere)) this.choose(this.stream.value);
+  }
+
   focusFilter(): void {
     this.query.focus();
     this.query.select();
+  }
+
+  /// Shows the entries between two times.
+  showBetween(from: number, to: number): void {
+    this.query.value = `time>=${from} time<${to}`;
+    this.filter();
   }
 
   /// After the reader has asked for what was typed, or no longer.
@@ -126,13 +159,17 @@ export class EntriesPane {
     if (!session) return;
     const hidden = this.hiddenStream(kind);
     const track = hidden ? hidden.track : session.track(kind);
-    this.rows = track ? new StreamRows(track, events.showsKeys) : new AllRows(session.allTracks(), events.showsKeys);
+    this.rows = track
+      ? new StreamRows(track, events.showsKeys, kind === 'cursorImage' ? session.appearances : [])
+      : new AllRows(session.allTracks(), events.showsKeys, session.merged(), session.appearances);
+    [this.order, this.isSorting] = [undefined, false];
     this.table.show(this.rows);
     this.showNote();
     this.filter();
     const { time } = this;
     this.time = -1;
     this.setTime(Math.max(0, time));
+    this.events.onChange();
   }
 
   private hiddenStream(choice: string): HiddenStream | undefined {
@@ -145,7 +182,7 @@ export class EntriesPane {
     const kind = hidden?.stream.kind ?? this.stream.value;
     const notes = hidden ? [`No reader finds this stream. ${hidden.reason}`] : [];
     if (!this.events.showsKeys() && kind === 'keyboardAction')
-      notes.push('What was typed is masked, here and in copies. Press k to see it.');
+      notes.push('What was typed is masked, here and in copies. Press t to see it.');
     this.note.hidden = notes.length === 0;
     setText(this.note, notes.join(' '));
   }
@@ -166,14 +203,41 @@ export class EntriesPane {
 
   private showMatches(rows: Rows, matches: Uint32Array | null, isDone: boolean): void {
     [this.rows, this.matches, this.isDone] = [rows, matches, isDone];
-    this.table.choose(matches);
+    if (!this.order) this.table.choose(matches);
+    else if (isDone && !this.isSorting) void this.showSorted();
     this.showStatus();
+  }
+
+  /// First upwards, then downwards, then as they come.
+  private async sort(column: number): Promise<void> {
+    const { rows, order } = this;
+    if (!rows) return;
+    const isNext = order?.column === column;
+    const wanted = isNext && order.isDescending ? undefined : { column, isDescending: isNext };
+    [this.order, this.isSorting] = [wanted, wanted !== undefined];
+    this.table.showOrder(wanted);
+    this.showStatus();
+    if (!wanted) return this.table.choose(this.matches);
+    await this.sorter.sort(rows, wanted);
+    if (wanted !== this.order) return;
+    this.isSorting = false;
+    if (this.isDone) await this.showSorted();
+  }
+
+  private async showSorted(): Promise<void> {
+    const { rows, matches, order } = this;
+    const { shown, places } = await this.sorter.shown(matches);
+    if (rows !== this.rows || matches !== this.matches || order !== this.order) return;
+    this.table.choose(shown, places);
+    this.showStatus();
+    if (order && rows) announce(`Sorted by ${rows.columns[order.column]!.title}`);
   }
 
   private showStatus(): void {
     const { rows, matches, isDone } = this;
     if (!rows) return;
     const found = matches ? `${count(matches.length)} of ${count(rows.count)}` : plural(rows.count, 'entry', 'entries');
+    if (this.isSorting) return setText(this.status, 'Sorting …');
     const { selectedCount } = this.table;
     const selected = selectedCount > 0 ? `, ${count(selectedCount)} selected` : '';
     setText(this.status, `${found}${isDone ? '' : ' …'}${selected}`);

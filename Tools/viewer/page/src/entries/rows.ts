@@ -2,8 +2,11 @@
 
 import { brief, clock, shown, titleOf } from '../model/format';
 import { mask } from '../model/keys';
-import { lastAt } from '../model/search';
+import { mergedOf, type Merged } from '../model/merged';
+import { partition } from '../model/search';
+import type { Appearance } from '../model/appearances';
 import type { Track } from '../model/track';
+import { cachedTest, clockTest, never, numberTest, type RowTest } from './words';
 
 export interface ColumnInfo {
   name: string;
@@ -26,7 +29,18 @@ export interface Rows {
   fields(row: number): Record<string, CellValue>;
   /// The last row that had happened at a time, or -1.
   rowAt(time: number): number;
+  /// Whether a cell of a row holds a word in small letters.
+  wordTest(word: string): RowTest;
+  /// The numbers or texts that a column is sorted by; undefined if it is not.
+  sortValues(column: number): SortValues | undefined;
+  isSortable(column: number): boolean;
+  /// The column that shows a picture, and what the cursor looks like in a row.
+  readonly pictureColumn: number;
+  appearance(row: number): Appearance | undefined;
 }
+
+/// What a reader sees of a row, as a value that can be compared, or nothing.
+export type SortValues = ArrayLike<unknown> | ((row: number) => unknown);
 
 const masked: Record<string, string[]> = { keyboardAction: ['characterCode', 'characterString'] };
 
@@ -49,6 +63,7 @@ export class StreamRows implements Rows {
   constructor(
     readonly track: Track,
     private readonly showsKeys: () => boolean,
+    private readonly appearances: Appearance[] = [],
   ) {
     const { columns } = track.entries;
     this.names = Object.keys(columns).filter((name) => name !== 'timestamp');
@@ -92,11 +107,61 @@ export class StreamRows implements Rows {
     return index < 0 ? -1 : this.track.row(index);
   }
 
+  wordTest(word: string): RowTest {
+    const tests = [this.timeTest(word), ...this.names.map((name) => this.columnTest(name, word, brief))];
+    return anyOf(tests);
+  }
+
+  /// Like `wordTest`, for `summary`.
+  summaryTest(word: string): RowTest {
+    if (/[=\s]/.test(word)) return (row) => this.summary(row).toLowerCase().includes(word);
+    if (this.names.some((name) => name.toLowerCase().includes(word))) return () => true;
+    return anyOf(this.names.map((name) => this.columnTest(name, word, String)));
+  }
+
+  timeTest(word: string): RowTest {
+    return clockTest(this.track.entries.time, timeText, word);
+  }
+
+  private columnTest(name: string, word: string, textOf: (value: number) => string): RowTest {
+    const column = this.track.entries.columns[name]!;
+    if (isMasked(this.track.kind, name, this.showsKeys())) return mask.includes(word) ? () => true : never;
+    if (ArrayBuffer.isView(column) && !(column instanceof BigUint64Array)) return numberTest(column, textOf, word);
+    return cachedTest(column as ArrayLike<unknown>, (value) => shown(String(plain(value) ?? '–')), word);
+  }
+
+  sortValues(column: number): SortValues {
+    if (column === 0) return this.track.entries.time;
+    const name = this.names[column - 1]!;
+    const values = this.track.entries.columns[name] as ArrayLike<unknown>;
+    if (isMasked(this.track.kind, name, this.showsKeys())) return () => mask;
+    return name === 'image' ? (row) => (values[row] as Uint8Array | null)?.length ?? null : values;
+  }
+
+  isSortable(): boolean {
+    return true;
+  }
+
+  get pictureColumn(): number {
+    return this.names.indexOf('image') + 1 || -1;
+  }
+
+  appearance(row: number): Appearance | undefined {
+    const place = this.track.place(row);
+    return place < 0 ? undefined : this.appearances[place];
+  }
+
   /// All fields in one line.
   summary(row: number): string {
     const parts = this.names.map((name) => `${name}=${this.value(row, name) ?? '–'}`);
     return shown(parts.join('  '));
   }
+}
+
+function anyOf(tests: RowTest[]): RowTest {
+  const possible = tests.filter((test) => test !== never);
+  if (possible.length === 0) return never;
+  return possible.length === 1 ? possible[0]! : (row) => possible.some((test) => test(row));
 }
 
 function isNumeric(column: unknown): boolean {
@@ -114,41 +179,22 @@ export class AllRows implements Rows {
     { name: 'entry', title: 'Entry', isNumber: false },
   ];
   private readonly streams: StreamRows[];
-  private readonly times: Float64Array;
   private readonly stream: Uint16Array;
   private readonly row: Uint32Array;
 
-  constructor(tracks: Track[], showsKeys: () => boolean) {
-    this.streams = tracks.map((track) => new StreamRows(track, showsKeys));
-    const count = tracks.reduce((sum, track) => sum + track.count, 0);
-    this.times = new Float64Array(count);
-    this.stream = new Uint16Array(count);
-    this.row = new Uint32Array(count);
-    this.merge(tracks);
-  }
-
-  /// Entries at the same time come in the order of their streams.
-  private merge(tracks: Track[]): void {
-    const next = tracks.map(() => 0);
-    for (let i = 0; i < this.times.length; ++i) {
-      let first = -1;
-      let earliest = Infinity;
-      for (let k = 0; k < tracks.length; ++k) {
-        const time = next[k]! < tracks[k]!.count ? tracks[k]!.times[next[k]!]! : Infinity;
-        if (time < earliest) [first, earliest] = [k, time];
-      }
-      this.times[i] = earliest;
-      this.stream[i] = first;
-      this.row[i] = tracks[first]!.row(next[first]!++);
-    }
+  constructor(tracks: Track[], showsKeys: () => boolean, merged: Merged = mergedOf(tracks), appearances?: Appearance[]) {
+    this.streams = tracks.map(
+      (track) => new StreamRows(track, showsKeys, track.kind === 'cursorImage' ? appearances : undefined),
+    );
+    ({ stream: this.stream, row: this.row } = merged);
   }
 
   get count(): number {
-    return this.times.length;
+    return this.row.length;
   }
 
   time(row: number): number {
-    return this.times[row]!;
+    return this.streams[this.stream[row]!]!.time(this.row[row]!);
   }
 
   cell(row: number, column: number): string {
@@ -167,7 +213,31 @@ export class AllRows implements Rows {
     return { kind: stream.track.kind, ...stream.fields(this.row[row]!) };
   }
 
+  wordTest(word: string): RowTest {
+    const tests = this.streams.map((stream) => {
+      if (titleOf(stream.track.kind).toLowerCase().includes(word)) return () => true;
+      return anyOf([stream.timeTest(word), stream.summaryTest(word)]);
+    });
+    return (row) => tests[this.stream[row]!]!(this.row[row]!);
+  }
+
+  sortValues(column: number): SortValues | undefined {
+    if (column === 0) return (row) => this.time(row);
+    const titles = this.streams.map(({ track }) => titleOf(track.kind));
+    return column === 1 ? (row) => titles[this.stream[row]!]! : undefined;
+  }
+
+  isSortable(column: number): boolean {
+    return column < 2;
+  }
+
+  readonly pictureColumn = 2;
+
+  appearance(row: number): Appearance | undefined {
+    return this.streams[this.stream[row]!]!.appearance(this.row[row]!);
+  }
+
   rowAt(time: number): number {
-    return lastAt(this.times, time);
+    return partition(this.count, (row) => this.time(row) <= time) - 1;
   }
 }

@@ -5,6 +5,8 @@ import { make, setText } from '../ui/dom';
 import { measured } from '../ui/marks';
 import { uiScale } from '../ui/scale';
 import type { Rows } from './rows';
+import type { SortOrder } from './sorter';
+import { Thumbnails } from './thumbnails';
 
 const rowLines = 24; // pixels of a row where text has its usual size
 const tallest = 16_000_000; // pixels: browsers do not lay out much more
@@ -35,9 +37,14 @@ export class Table {
   onActivate: (row: number) => void = () => {};
   /// Told when other rows are selected.
   onSelect: () => void = () => {};
+  /// Asked to sort by a column.
+  onSort: (column: number) => void = () => {};
   private rows: Rows | undefined;
   /// The rows to show; null is all of them.
   private chosen: Uint32Array | null = null;
+  /// The place of each row, if they have another order than their own.
+  private places: Int32Array | null = null;
+  private readonly thumbnails = new Thumbnails();
   private readonly head = make('div', { class: 'table-head', role: 'row', 'aria-rowindex': 1 });
   private readonly space = make('div', { class: 'table-space', role: 'rowgroup' });
   private readonly scroller = make('div', { class: 'table', role: 'grid', tabindex: 0, 'aria-label': 'Entries' });
@@ -64,7 +71,8 @@ export class Table {
   }
 
   show(rows: Rows): void {
-    [this.rows, this.chosen, this.current] = [rows, null, -1];
+    [this.rows, this.chosen, this.places, this.current] = [rows, null, null, -1];
+    this.thumbnails.clear();
     this.place(-1, -1, false);
     const least = rows.columns.map((_, column) => leastWidth(rows, column));
     const widths = rows.columns.map(({ name, isNumber }, i) =>
@@ -73,8 +81,12 @@ export class Table {
     this.scroller.style.setProperty('--columns', widths.join(' '));
     this.scroller.style.setProperty('--least', `${least.reduce((sum, width) => sum + width + 0.625, 1)}rem`);
     this.head.replaceChildren(
-      ...rows.columns.map(({ title, isNumber }) =>
-        make('div', { role: 'columnheader', class: isNumber ? 'is-number' : undefined, title }, title),
+      ...rows.columns.map(({ title, isNumber }, column) =>
+        make(
+          'div',
+          { role: 'columnheader', class: isNumber ? 'is-number' : undefined, title },
+          rows.isSortable(column) ? this.sortButton(title, column) : title,
+        ),
       ),
     );
     for (const element of this.pool) element.remove();
@@ -84,8 +96,26 @@ export class Table {
     this.resize();
   }
 
-  choose(chosen: Uint32Array | null): void {
-    this.chosen = chosen;
+  private sortButton(title: string, column: number): HTMLElement {
+    const button = make('button', { type: 'button', class: 'sort', 'aria-label': `Sort by ${title}` }, title);
+    button.addEventListener('click', () => this.onSort(column));
+    return button;
+  }
+
+  /// Tells by which column the rows are sorted.
+  showOrder(order: SortOrder | undefined): void {
+    [...this.head.children].forEach((cell, column) => {
+      if (order?.column !== column) cell.removeAttribute('aria-sort');
+      else cell.setAttribute('aria-sort', order.isDescending ? 'descending' : 'ascending');
+    });
+  }
+
+  /// Rows in another order than their own come with the place of each of them.
+  choose(chosen: Uint32Array | null, places: Int32Array | null = null): void {
+    const { current } = this;
+    const row = current >= 0 && current < this.shownCount ? this.rowAt(current) : -1;
+    [this.chosen, this.places] = [chosen, places];
+    this.current = row >= 0 ? this.placeOf(row) : -1;
     this.place(-1, -1, false);
     this.resize();
     this.scrollTo(this.top);
@@ -117,7 +147,7 @@ export class Table {
     const place = this.placeOf(row);
     if (place === this.current) return;
     this.current = place;
-    if (follows && place >= 0) this.reveal(place);
+    if (follows && place >= 0 && !this.places) this.reveal(place);
     this.draw();
   }
 
@@ -154,6 +184,7 @@ export class Table {
 
   /// Of the row itself or the last one before it that is shown.
   private placeOf(row: number): number {
+    if (this.places) return this.places[row] ?? -1;
     if (!this.chosen) return row;
     return countUntil(this.chosen, row) - 1;
   }
@@ -241,7 +272,12 @@ export class Table {
     if (element.dataset.row === String(row)) return;
     element.dataset.row = String(row);
     element.setAttribute('aria-rowindex', String(place + 2));
-    [...element.children].forEach((cell, column) => setText(cell as HTMLElement, rows.cell(row, column)));
+    [...element.children].forEach((cell, column) => {
+      const isPicture = column === rows.pictureColumn;
+      if (isPicture) this.thumbnails.remove(cell as HTMLElement);
+      setText(cell as HTMLElement, rows.cell(row, column));
+      if (isPicture) this.thumbnails.place(cell as HTMLElement, rows.appearance(row));
+    });
   }
 
   private click(event: MouseEvent): void {
@@ -255,6 +291,7 @@ export class Table {
   }
 
   private press(event: KeyboardEvent): void {
+    if (this.head.contains(event.target as Node)) return;
     const page = Math.max(1, Math.floor(this.room / this.rowHeight) - 1);
     const last = this.shownCount - 1;
     const from = this.selected >= 0 ? this.selected : Math.max(0, this.current);

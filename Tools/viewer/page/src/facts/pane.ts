@@ -1,8 +1,10 @@
 // What is known of a recording as a whole, and what is wrong with it.
 
 import type { StreamSummary } from '#decoder';
+import type { Adjustment } from '../adjust/adjustment';
 import { doubtsAbout } from '../model/checks';
 import { brief, bytes, clock, count, memoryText, plural, shown, titleOf } from '../model/format';
+import { decimal } from '../model/decimals';
 import type { Size } from '../model/geometry';
 import { idleTime } from '../model/idle';
 import type { Finding, Session } from '../model/session';
@@ -19,10 +21,16 @@ function list(facts: Fact[]): HTMLElement {
   return make('dl', {}, ...facts.flatMap(([name, value]) => [make('dt', {}, shown(name)), make('dd', {}, shown(value))]));
 }
 
-export function showFacts(session: Session, duration: number): void {
+export interface FactsEvents {
+  onAdjust: () => void;
+}
+
+export function showFacts(session: Session, duration: number, adjustment: Adjustment, events: FactsEvents): void {
+  const adjust = make('button', { class: 'button is-small is-outlined', type: 'button' }, 'Adjust…');
+  adjust.addEventListener('click', events.onAdjust);
   byId('pane-facts').replaceChildren(
     section('Recording', list(recordingFacts(session, duration))),
-    section('Screen', list(screenFacts(session))),
+    section('Screen', list(screenFacts(session, adjustment)), adjust),
     section('Activity', list(activityFacts(session))),
     ...optional('Made by', creatorFacts(session)),
     ...optional('Machine', machineFacts(session)),
@@ -44,11 +52,14 @@ function recordingFacts({ name, container, info }: Session, duration: number): F
   return facts;
 }
 
-function screenFacts({ region, scaleFactor }: Session): Fact[] {
-  return [
-    ['Recorded region', region ? `${region.width} × ${region.height} at ${region.x}, ${region.y}` : 'not recorded'],
+function screenFacts({ region, scaleFactor }: Session, adjustment: Adjustment): Fact[] {
+  const text = region ? `${region.width} × ${region.height} at ${region.x}, ${region.y}` : 'not recorded';
+  const facts: Fact[] = [
+    ['Recorded region', adjustment.region ? `${text}, set by hand` : text],
     ['Scale factor', brief(scaleFactor)],
   ];
+  if (adjustment.offset !== 0) facts.push(['Offset of times', `${decimal(adjustment.offset)} s, set by hand`]);
+  return facts;
 }
 
 function activityFacts(session: Session): Fact[] {

@@ -12,7 +12,8 @@ export interface Pixels {
 
 const packBits = 32773;
 
-/// Of the first picture. Throws where the file is damaged, or of a form that is rarer than 8 or 16 bits in rows.
+/// Returns the pixels of the first picture. Throws if the file is damaged, or stores its pixels in another way than in
+/// rows of 8 or 16 bits.
 export function pixelsOfTIFF(bytes: Uint8Array): Pixels {
   const [header] = decode(bytes, { pages: [0], ignoreImageData: true });
   if (!header) throw new Error('it holds no picture');
@@ -60,7 +61,7 @@ function unpacked(header: TiffIfd, bytes: Uint8Array): Uint8Array {
 
 type Samples = ArrayLike<number>;
 
-/// Whatever stands behind the colours is alpha.
+/// The sample that follows the colours is alpha.
 function pixelsOf({ width, height, samplesPerPixel: step, type, bitsPerSample }: TiffIfd, samples: Samples): Pixels {
   const data = new Uint8ClampedArray(width * height * 4).fill(255);
   const colours = type === 2 ? 3 : 1;

@@ -1,9 +1,8 @@
 // Time along the lanes.
 
-export interface Range {
-  from: number;
-  to: number;
-}
+import type { TimeRange } from '../model/link';
+
+export type Range = TimeRange;
 
 const steps = [0.001, 0.002, 0.005, 0.01, 0.02, 0.05, 0.1, 0.2, 0.5, 1, 2, 5, 10, 15, 30, 60, 120, 300, 600, 900, 1800];
 
@@ -19,7 +18,7 @@ export function ticks(range: Range, step: number): number[] {
   return Array.from({ length: Math.max(0, last - first + 1) }, (_, i) => (first + i) * step);
 }
 
-/// Digits behind the second that tell two marks apart.
+/// Returns how many decimals of a second tell two marks apart.
 export function tickDigits(step: number): number {
   return step >= 1 ? 0 : Math.ceil(-Math.log10(step) - 1e-9);
 }
@@ -33,7 +32,7 @@ export function clampedRange({ from, to }: Range, duration: number): Range {
   return { from: start, to: start + length };
 }
 
-/// `factor` times as long, with `anchor` where it was.
+/// Returns a range that is `factor` times as long and has `anchor` at the same place.
 export function zoomed({ from, to }: Range, anchor: number, factor: number, duration: number): Range {
   const length = Math.min(Math.max((to - from) * factor, Math.min(shortest, duration)), duration);
   const place = (anchor - from) / (to - from);

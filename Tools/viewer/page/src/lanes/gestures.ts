@@ -2,11 +2,11 @@
 
 export interface Gestures {
   /// All in pixels from the element's left edge.
-  start?: (x: number) => void;
+  start?: (x: number, event: PointerEvent) => void;
   /// `way` is how far it is from the start.
-  move?: (x: number, way: number) => void;
+  move?: (x: number, way: number, event: PointerEvent) => void;
   /// Went down and up again in the same place.
-  click?: (x: number) => void;
+  click?: (x: number, event: PointerEvent) => void;
   /// Two fingers: around `x`, `factor` times as much is to be seen.
   pinch?: (x: number, factor: number) => void;
 }
@@ -26,7 +26,7 @@ export function dragging(element: HTMLElement, gestures: Gestures): void {
     element.setPointerCapture(event.pointerId);
     if (fingers.size > 1) return void (wasPinch = true);
     [from, isDrag, wasPinch] = [xOf(event), false, false];
-    gestures.start?.(from);
+    gestures.start?.(from, event);
   });
 
   element.addEventListener('pointermove', (event) => {
@@ -40,13 +40,13 @@ export function dragging(element: HTMLElement, gestures: Gestures): void {
       if (was > 8 && is > 8) gestures.pinch?.((x + other) / 2, was / is);
     } else if (!wasPinch) {
       isDrag ||= Math.abs(x - from) > slop;
-      if (isDrag || !gestures.click) gestures.move?.(x, x - from);
+      if (isDrag || !gestures.click) gestures.move?.(x, x - from, event);
     }
   });
 
   const end = (event: PointerEvent) => {
     if (!fingers.delete(event.pointerId) || fingers.size > 0) return;
-    if (!isDrag && !wasPinch && event.type === 'pointerup') gestures.click?.(xOf(event));
+    if (!isDrag && !wasPinch && event.type === 'pointerup') gestures.click?.(xOf(event), event);
   };
   element.addEventListener('pointerup', end);
   element.addEventListener('pointercancel', end);

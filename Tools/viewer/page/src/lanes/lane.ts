@@ -1,12 +1,14 @@
 // One row of the timeline, and the ways in which rows are drawn.
 
+import type { Extremes } from '../model/extremes';
 import { countBefore, countUntil } from '../model/search';
 import { shortened } from '../stage/layers';
 import type { Palette } from '../ui/palette';
 import type { Range } from './axis';
-import type { Extremes } from './extremes';
 
 export interface Lane {
+  /// Tells it from all others, in every recording.
+  id: string;
   title: string;
   /// Of a stream that no reader finds.
   isHidden?: boolean;
@@ -76,6 +78,8 @@ export interface Curve {
   /// The values at the lower and the upper edge.
   low: number;
   high: number;
+  /// Grows with the value; by itself it is the value itself.
+  shape?: (value: number) => number;
 }
 
 /// From the lower edge to the greatest value.
@@ -127,8 +131,9 @@ export function drawLine(canvas: LaneCanvas, curve: Curve, colour: string): void
   context.globalAlpha = 1;
 }
 
-function yOf({ top, height }: LaneCanvas, { low, high }: Curve, value: number): number {
-  const part = Math.max(0, Math.min(1, (value - low) / (high - low || 1)));
+function yOf({ top, height }: LaneCanvas, { low, high, shape = (value) => value }: Curve, value: number): number {
+  const [from, to] = [shape(low), shape(high)];
+  const part = Math.max(0, Math.min(1, (shape(value) - from) / (to - from || 1)));
   return top + height - 2 - part * (height - 4);
 }
 
@@ -184,7 +189,8 @@ export function drawBands(
     context.stroke();
     const room = { left: Math.max(0, x) + 6, right: right - 7 };
     if (width > 24 && text) drawBandText(canvas, text, room, isWhole);
-    i = right - x > 2 ? i + 1 : Math.max(i + 1, countBefore(times, canvas.time(x + 2)));
+    // Of those that begin within these two pixels, the last one may hold for long.
+    i = right - x > 2 ? i + 1 : Math.max(i + 1, countBefore(times, canvas.time(x + 2)) - 1);
   }
 }
 

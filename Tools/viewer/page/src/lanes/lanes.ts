@@ -3,22 +3,29 @@
 import { clickLabel, type Click } from '../model/clicks';
 import { StreamRows } from '../entries/rows';
 import { brief, titleOf } from '../model/format';
+import { Extremes } from '../model/extremes';
 import { keyCap } from '../model/keys';
 import type { Rect } from '../model/geometry';
+import type { Note } from '../model/notes';
 import { countBefore, countUntil, lastAt } from '../model/search';
 import { rectAt, type HiddenStream, type Session } from '../model/session';
 import type { Track } from '../model/track';
-import { Extremes } from './extremes';
 import { drawArea, drawBands, drawDensity, drawLine, type Curve, type Lane, type LaneCanvas } from './lane';
 
 export interface LaneOptions {
   showsKeys: () => boolean;
   /// What of the screen the movie shows.
   region: () => Rect;
+  /// The notes in the order of their times.
+  notes: () => readonly Note[];
 }
+
+/// A lane before it is told from others of its name.
+type NamelessLane = Omit<Lane, 'id'>;
 
 export function lanesOf(session: Session, options: LaneOptions): Lane[] {
   const lanes = [
+    notesLane(session, options),
     slideLane(session),
     textLane(session, 'topmostAppName', 'name', 'Application'),
     textLane(session, 'topmostWindowTitle', 'title', 'Window'),
@@ -33,13 +40,44 @@ export function lanesOf(session: Session, options: LaneOptions): Lane[] {
     cpuLane(session),
     ...session.hidden.slice(0, mostHidden).map((hidden) => hiddenLane(hidden, options)),
   ];
-  return lanes.filter((lane): lane is Lane => lane !== undefined);
+  return identified(lanes.filter((lane): lane is NamelessLane => lane !== undefined));
+}
+
+/// Two hidden streams may have one name.
+function identified(lanes: NamelessLane[]): Lane[] {
+  const names = lanes.map(({ title, isHidden }) => (isHidden ? `${title} (hidden)` : title));
+  return lanes.map((lane, i) => {
+    const sooner = names.slice(0, i).filter((name) => name === names[i]).length;
+    return { ...lane, id: sooner > 0 ? `${names[i]} ${sooner + 1}` : names[i]! };
+  });
 }
 
 const mostHidden = 12;
 
+const noteEnd = 0.6; // seconds after which a note is no longer that of the playhead
+
+function notesLane({ duration }: Session, { notes }: LaneOptions): NamelessLane | undefined {
+  const all = notes();
+  if (all.length === 0) return undefined;
+  const times = Float64Array.from(all, ({ time }) => time);
+  return {
+    title: 'Notes',
+    height: 23,
+    draw: (canvas) =>
+      drawBands(canvas, times, (index) => {
+        const { bands, bandEdges } = canvas.palette;
+        const [start, end] = [times[index]!, times[index + 1] ?? duration];
+        return { start, end, text: all[index]!.text, colour: bands[2]!, edge: bandEdges[2]! };
+      }),
+    valueAt: (time) => {
+      const index = lastAt(times, time);
+      return index >= 0 && time - times[index]! < noteEnd ? all[index]!.text : '';
+    },
+  };
+}
+
 /// When a stream that no reader finds has entries.
-function hiddenLane({ stream, track }: HiddenStream, { showsKeys }: LaneOptions): Lane | undefined {
+function hiddenLane({ stream, track }: HiddenStream, { showsKeys }: LaneOptions): NamelessLane | undefined {
   if (!track || track.count === 0) return undefined;
   const rows = new StreamRows(track, showsKeys);
   return {
@@ -82,7 +120,7 @@ function bandLane(
   title: string,
   textOf: (track: Track, index: number) => string,
   colourOf: (name: BandName) => number,
-): Lane | undefined {
+): NamelessLane | undefined {
   const track = filled(session, kind);
   return (
     track && {
@@ -106,7 +144,7 @@ function bandLane(
 
 const textsOf = (column: string) => (track: Track, index: number) => track.text(column, index);
 
-function textLane(session: Session, kind: string, column: string, title: string): Lane | undefined {
+function textLane(session: Session, kind: string, column: string, title: string): NamelessLane | undefined {
   const colours = new NameColours();
   return bandLane(session, kind, title, textsOf(column), ({ text, time }) =>
     colours.of(appAt(session, time) || text),
@@ -119,7 +157,7 @@ function appAt(session: Session, time: number): string {
   return index >= 0 ? track!.text('name', index) : '';
 }
 
-function slideLane(session: Session): Lane | undefined {
+function slideLane(session: Session): NamelessLane | undefined {
   const kinds: [string, string][] = [
     ['slideTitles', 'title'],
     ['slideText', 'text'],
@@ -135,7 +173,7 @@ function rectText(track: Track, index: number): string {
 }
 
 /// Shown on its own only where there are no names for its windows.
-function windowLane(session: Session): Lane | undefined {
+function windowLane(session: Session): NamelessLane | undefined {
   if (filled(session, 'topmostAppName') || filled(session, 'topmostWindowTitle')) return undefined;
   const colours = new NameColours();
   return bandLane(session, 'topmostWindow', 'Window', rectText, ({ text }) => colours.of(text));
@@ -143,7 +181,7 @@ function windowLane(session: Session): Lane | undefined {
 
 const roomForClicks = 6; // pixels to a click, from which on each is drawn
 
-function clickLane({ clicks }: Session): Lane | undefined {
+function clickLane({ clicks }: Session): NamelessLane | undefined {
   if (clicks.length === 0) return undefined;
   const starts = Float64Array.from(clicks, ({ start }) => start);
   return {
@@ -195,7 +233,7 @@ function clickShape(button: string, x: number, y: number): Path2D {
 
 const roomForKeys = 12; // pixels to a key, from which on each shows what it is
 
-function keyLane(session: Session, { showsKeys }: LaneOptions): Lane | undefined {
+function keyLane(session: Session, { showsKeys }: LaneOptions): NamelessLane | undefined {
   const keys = () => session.keys(showsKeys())!;
   if (!session.keys(false)?.count) return undefined;
   return {
@@ -251,11 +289,13 @@ function valuesOf(track: Track, value: (index: number) => number): Float32Array 
 /// Without the few that would flatten everything else.
 function usualGreatest(values: Float32Array): number {
   const step = Math.max(1, Math.floor(values.length / 20000));
-  const some = values.filter((_, i) => i % step === 0 && values[i]! > 0).sort();
+  const some = Float32Array.from({ length: Math.ceil(values.length / step) }, (_, i) => values[i * step]!)
+    .filter((value) => value > 0)
+    .sort();
   return some.length > 0 ? some[Math.floor(some.length * 0.995)]! : 1;
 }
 
-function scrollLane(session: Session): Lane | undefined {
+function scrollLane(session: Session): NamelessLane | undefined {
   const track = filled(session, 'scrollAction');
   if (!track) return undefined;
   const distances = valuesOf(track, (i) => track.number('y', i) || track.number('x', i));
@@ -303,11 +343,10 @@ function drawScroll(canvas: LaneCanvas, times: Float64Array, extremes: Extremes,
   }
 }
 
-function speedLane(session: Session): Lane | undefined {
+function speedLane(session: Session): NamelessLane | undefined {
   if (!filled(session, 'cursorLocation')) return undefined;
   const { times, values } = session.speed;
-  const extremes = new Extremes(values.map(Math.sqrt));
-  const curve = { times, extremes, low: 0, high: Math.sqrt(usualGreatest(values)) };
+  const curve = { times, extremes: session.speedExtremes, low: 0, high: usualGreatest(values), shape: Math.sqrt };
   return {
     title: 'Cursor speed',
     height: 30,
@@ -323,11 +362,10 @@ function curveOf(track: Track, values: Float32Array, low: number, high: number):
   return { times: track.times, extremes: new Extremes(values), low, high };
 }
 
-function trailLane(session: Session, { region }: LaneOptions): Lane | undefined {
+function trailLane(session: Session, { region }: LaneOptions): NamelessLane | undefined {
   const track = filled(session, 'cursorLocation');
   if (!track) return undefined;
-  const xs = new Extremes(valuesOf(track, (i) => track.number('x', i)));
-  const ys = new Extremes(valuesOf(track, (i) => -track.number('y', i)));
+  const [xs, ys] = [session.positionExtremes('x'), session.positionExtremes('y')];
   return {
     title: 'Cursor',
     legend: [
@@ -339,7 +377,7 @@ function trailLane(session: Session, { region }: LaneOptions): Lane | undefined 
       const { x, y, width, height } = region();
       const { times } = track;
       drawLine(canvas, { times, extremes: xs, low: x, high: x + width }, canvas.palette.accent);
-      drawLine(canvas, { times, extremes: ys, low: -(y + height), high: -y }, canvas.palette.second);
+      drawLine(canvas, { times, extremes: ys, low: y + height, high: y }, canvas.palette.second);
     },
     valueAt: (time) => {
       const index = track.at(time);
@@ -348,20 +386,22 @@ function trailLane(session: Session, { region }: LaneOptions): Lane | undefined 
   };
 }
 
+/// The entries whose values are not those of the entry before.
+function changesOf(track: Track, names: string[]): number[] {
+  const columns = names.map((name) => track.values(name));
+  const changes: number[] = [];
+  for (let i = 0; i < track.count; ++i)
+    if (i === 0 || columns.some((values) => values[i] !== values[i - 1])) changes.push(i);
+  return changes;
+}
+
 /// Rectangles that stay the same are one.
-function hoverLane(session: Session): Lane | undefined {
+function hoverLane(session: Session): NamelessLane | undefined {
   const track = filled(session, 'hoverRect');
   if (!track) return undefined;
-  const starts: number[] = [];
-  const texts: string[] = [];
-  let last = '';
-  for (let i = 0; i < track.count; ++i) {
-    const text = rectText(track, i);
-    if (text === last) continue;
-    starts.push(track.times[i]!);
-    texts.push((last = text));
-  }
-  const times = Float64Array.from(starts);
+  const firsts = changesOf(track, ['x', 'y', 'width', 'height']);
+  const times = Float64Array.from(firsts, (index) => track.times[index]!);
+  const textOf = (place: number) => (place >= 0 ? rectText(track, firsts[place]!) : '');
   return {
     title: 'Hover',
     height: 18,
@@ -372,17 +412,17 @@ function hoverLane(session: Session): Lane | undefined {
         (index) => ({
           start: times[index]!,
           end: times[index + 1] ?? session.duration,
-          text: texts[index]!,
+          text: textOf(index),
           colour: index % 2 ? canvas.palette.line : canvas.palette.grid,
           edge: canvas.palette.edge,
         }),
         true,
       ),
-    valueAt: (time) => texts[lastAt(times, time)] ?? '',
+    valueAt: (time) => textOf(lastAt(times, time)),
   };
 }
 
-function opacityLane(session: Session): Lane | undefined {
+function opacityLane(session: Session): NamelessLane | undefined {
   const track = filled(session, 'cursorOpacity');
   if (!track) return undefined;
   const curve = curveOf(
@@ -399,7 +439,7 @@ function opacityLane(session: Session): Lane | undefined {
   };
 }
 
-function cpuLane(session: Session): Lane | undefined {
+function cpuLane(session: Session): NamelessLane | undefined {
   const track = filled(session, 'cpuUsage');
   if (!track) return undefined;
   const values = valuesOf(track, (i) => track.number('cpuUsage', i));

@@ -5,7 +5,6 @@ import { fitCanvas, make } from '../ui/dom';
 import { palette } from '../ui/palette';
 import { uiScale } from '../ui/scale';
 import { clampedRange, type Range } from './axis';
-import { Extremes } from './extremes';
 import { dragging } from './gestures';
 import { drawArea, LaneCanvas, type Curve } from './lane';
 
@@ -29,15 +28,18 @@ export class Overview {
   private range: Range = { from: 0, to: 1 };
   private isStale = true;
 
-  constructor(private readonly onRange: (range: Range) => void) {
-    this.element.append(this.canvas, this.window, this.playhead);
+  /// `strip` shows the selection.
+  constructor(
+    private readonly onRange: (range: Range) => void,
+    strip: HTMLElement,
+  ) {
+    this.element.append(this.canvas, strip, this.window, this.playhead);
     this.setUpDragging();
   }
 
   show(session: Session, duration: number): void {
     if (session !== this.session) {
-      const { times, values } = session.speed;
-      this.curve = { times, extremes: new Extremes(values.map(Math.sqrt)), low: 0, high: 70 };
+      this.curve = { times: session.speed.times, extremes: session.speedExtremes, low: 0, high: 4900, shape: Math.sqrt };
     }
     [this.session, this.duration, this.isStale] = [session, duration, true];
   }

@@ -6,32 +6,49 @@ import { byId, fitCanvas, make, setText } from '../ui/dom';
 import { setIcon } from '../ui/icons';
 import { palette } from '../ui/palette';
 import { uiScale } from '../ui/scale';
+import { store, stored } from '../ui/storage';
+import { Arrangement } from './arrangement';
 import { clampedRange, tickDigits, ticks, tickStep, zoomed, type Range } from './axis';
+import { arrangeLanes } from './dialog';
 import { dragging } from './gestures';
+import { LaneLabel, type LabelEvents } from './labels';
 import { LaneCanvas, type Lane } from './lane';
 import { lanesOf, type LaneOptions } from './lanes';
 import { Overview } from './overview';
+import { SelectionView } from '../range/view';
 
 export interface TimelineEvents extends LaneOptions {
   onSeek: (time: number) => void;
   onRange: (range: Range) => void;
+  /// Asks for a selection between two times, in any order.
+  onSelect: (one: number, other: number) => void;
+  /// Moves the end of the selection that is at the playhead.
+  onExtend: (time: number) => void;
 }
 
 const rulerHeight = 26;
 const laneGap = 1;
 const headHeight = 62; // of the overview and the ruler
+const arrangementKey = 'zulm-lanes';
 
 export class Timeline {
   range: Range = { from: 0, to: 1 };
   private session: Session | undefined;
   private duration = 1;
-  private lanes: Lane[] = [];
-  private values: HTMLElement[] = [];
+  /// All of the recording, in their usual order.
+  lanes: Lane[] = [];
+  arrangement = Arrangement.read(stored(arrangementKey));
+  private pinned: LaneLabel[] = [];
+  private others: LaneLabel[] = [];
   private isStale = true;
   private shownTime = -1;
   private time = 0;
   private readonly overview: Overview;
-  private readonly labels = make('div', { class: 'lane-labels' });
+  private readonly pinnedLabels = make('div', { class: 'pinned-labels' });
+  private readonly otherLabels = make('div');
+  private readonly labels = make('div', { class: 'lane-labels' }, this.pinnedLabels, this.otherLabels);
+  private readonly pinnedCanvas = make('canvas', { class: 'pinned-canvas', 'aria-hidden': 'true' });
+  private readonly selection: SelectionView;
   private readonly lanesCanvas = make('canvas', { class: 'lanes-canvas', 'aria-hidden': 'true' });
   private readonly rulerCanvas = make('canvas', { class: 'ruler-canvas', 'aria-hidden': 'true' });
   private readonly ruler = make('div', {
@@ -56,12 +73,18 @@ export class Timeline {
   private readonly zoomText = make('span', { class: 'zoom-text' });
 
   constructor(private readonly events: TimelineEvents) {
-    this.overview = new Overview((range) => this.setRange(range));
+    this.selection = new SelectionView(events.onSelect);
+    this.overview = new Overview((range) => this.setRange(range), this.selection.strip);
     this.build();
+    let anchor: number | undefined;
     dragging(this.ruler, {
-      start: (x) => this.events.onSeek(this.timeAt(x)),
-      move: (x) => this.events.onSeek(this.timeAt(x)),
+      start: (x, { shiftKey }) => {
+        anchor = shiftKey ? this.timeAt(x) : undefined;
+        if (!shiftKey) this.events.onSeek(this.timeAt(x));
+      },
+      move: (x) => (anchor === undefined ? this.events.onSeek(this.timeAt(x)) : this.events.onSelect(anchor, this.timeAt(x))),
     });
+    byId('timeline').addEventListener('keydown', (event) => this.selectByKey(event));
     this.setUpLanes();
     new ResizeObserver(() => this.resized()).observe(this.body);
   }
@@ -85,15 +108,16 @@ export class Timeline {
       tool('minus', 'Zoom out', () => this.zoom(2)),
       tool('plus', 'Zoom in', () => this.zoom(0.5)),
       tool('fit', 'Show all', () => this.showAll()),
+      tool('lanes', 'Arrange the lanes', () => arrangeLanes(this)),
       this.zoomText,
     );
     this.ruler.append(this.rulerCanvas);
-    this.body.append(this.lanesCanvas);
+    this.body.append(this.pinnedCanvas, this.lanesCanvas);
     root.append(
       make('div', { class: 'timeline-row' }, tools, this.overview.element),
       make('div', { class: 'timeline-row' }, make('div', { class: 'ruler-label' }, 'Time'), this.ruler),
       this.scroller,
-      make('div', { class: 'playhead-holder', 'aria-hidden': 'true' }, this.pointerLine, this.playhead),
+      make('div', { class: 'playhead-holder', 'aria-hidden': 'true' }, this.selection.element, this.pointerLine, this.playhead),
       this.tip,
     );
   }
@@ -102,32 +126,56 @@ export class Timeline {
     this.session = session;
     this.duration = duration;
     this.lanes = lanesOf(session, this.events);
-    this.values = this.lanes.map(() => make('span', { class: 'lane-value' }));
-    this.labels.replaceChildren(
-      ...this.lanes.map(({ title, legend = [], height, isHidden }, i) => {
-        const label = make(
-          'div',
-          { class: isHidden ? 'lane-label is-hidden' : 'lane-label' },
-          make(
-            'span',
-            { class: 'lane-title', title },
-            title,
-            ...legend.flatMap(({ text, colour }) => [' ', make('span', { class: `legend is-${colour}` }, text)]),
-          ),
-          isHidden ? make('span', { class: 'tag' }, 'hidden') : this.values[i]!,
-        );
-        label.style.height = `${(height + laneGap) / 16}rem`;
-        return label;
-      }),
-    );
-    document.documentElement.style.setProperty('--lanes-content', `${(headHeight + this.lanesHeight) / 16}rem`);
+    this.placeLanes();
     this.overview.show(session, duration);
     this.ruler.setAttribute('aria-valuemax', duration.toFixed(3));
     this.setRange({ from: 0, to: duration });
   }
 
-  private get lanesHeight(): number {
-    return this.lanes.reduce((sum, lane) => sum + lane.height + laneGap, 0);
+  /// Orders the lanes as the reader wants them.
+  private placeLanes(): void {
+    const { pinned, others } = this.arrangement.arranged(this.lanes);
+    const events: LabelEvents = {
+      onMove: (id, target) => this.change(() => this.arrangement.move(this.lanes, id, target)),
+      onResize: (id, height) => this.change(() => this.arrangement.resize(id, height)),
+    };
+    const labels = (lanes: Lane[], isPinned: boolean) =>
+      lanes.map((lane) => new LaneLabel(lane, isPinned, laneGap, events));
+    [this.pinned, this.others] = [labels(pinned, true), labels(others, false)];
+    this.pinnedLabels.replaceChildren(...this.pinned.map(({ element }) => element));
+    this.otherLabels.replaceChildren(...this.others.map(({ element }) => element));
+    const height = headHeight + heightOf(this.pinned) + heightOf(this.others);
+    document.documentElement.style.setProperty('--lanes-content', `${height / 16}rem`);
+    this.invalidate();
+  }
+
+  /// Called after the notes changed.
+  refreshLanes(): void {
+    if (!this.session) return;
+    this.lanes = lanesOf(this.session, this.events);
+    this.placeLanes();
+  }
+
+  /// What the lanes show; undefined if it is everything.
+  get zoomed(): Range | undefined {
+    return this.range.to - this.range.from < this.duration ? this.range : undefined;
+  }
+
+  private change(how: () => void): void {
+    how();
+    this.rearrange();
+  }
+
+  /// Called after the arrangement was changed.
+  rearrange(): void {
+    store(arrangementKey, this.arrangement.text());
+    this.placeLanes();
+  }
+
+  resetLanes(): void {
+    this.arrangement = new Arrangement();
+    store(arrangementKey, null);
+    this.placeLanes();
   }
 
   /// A movie may be longer than what was recorded beside it.
@@ -154,6 +202,41 @@ export class Timeline {
 
   showAll(): void {
     this.setRange({ from: 0, to: this.duration });
+  }
+
+  showSelection(range: Range | undefined): void {
+    this.selection.show(range, this.duration);
+    this.drawSelection();
+  }
+
+  private drawSelection(): void {
+    this.selection.draw({
+      width: this.width,
+      xOf: (time) => this.xOf(time),
+      timeAt: (x) => this.timeAt(x),
+    });
+  }
+
+  /// A part of what is in sight, whose edges can be dragged then.
+  selectSome(): void {
+    const { from, to } = this.range;
+    const part = (to - from) / 4;
+    const start = Math.max(from, Math.min(this.time, to - part));
+    this.events.onSelect(start, start + part);
+  }
+
+  private selectByKey(event: KeyboardEvent): void {
+    const step = tickStep(this.range, this.width / uiScale(), 84) / 5;
+    const times: Record<string, number> = {
+      ArrowLeft: this.time - step,
+      ArrowRight: this.time + step,
+      Home: 0,
+      End: this.duration,
+    };
+    const time = times[event.key];
+    if (time === undefined || !event.shiftKey || event.ctrlKey || event.altKey || event.metaKey) return;
+    event.preventDefault();
+    this.events.onExtend(Math.max(0, Math.min(time, this.duration)));
   }
 
   /// By a part of what is in sight.
@@ -197,6 +280,7 @@ export class Timeline {
     if (!this.session) return;
     if (this.isStale) {
       this.drawLanes();
+      this.drawSelection();
       if (this.pointed) this.point(this.pointed);
     }
     this.overview.draw(this.range, time);
@@ -206,7 +290,7 @@ export class Timeline {
     const x = this.xOf(time);
     this.playhead.hidden = x < -1 || x > this.width + 1;
     this.playhead.style.transform = `translateX(${x}px)`;
-    this.lanes.forEach((lane, i) => setText(this.values[i]!, lane.valueAt(time)));
+    for (const { lane, value } of [...this.pinned, ...this.others]) setText(value, lane.valueAt(time));
     this.ruler.setAttribute('aria-valuenow', time.toFixed(3));
     this.ruler.setAttribute('aria-valuetext', spokenTime(time));
   }
@@ -227,24 +311,30 @@ export class Timeline {
   private drawLanes(): void {
     this.isStale = false;
     const scale = uiScale();
+    this.drawBlock(this.pinnedCanvas, this.pinned, scale);
+    this.drawBlock(this.lanesCanvas, this.others, scale);
+    this.drawRuler(scale);
+  }
+
+  /// Lanes below one another.
+  private drawBlock(element: HTMLCanvasElement, labels: LaneLabel[], scale: number): void {
     const width = this.width / scale;
-    const height = this.lanesHeight;
-    this.lanesCanvas.style.height = `${height * scale}px`;
-    const ratio = fitCanvas(this.lanesCanvas, this.width, height * scale) * scale;
-    const context = this.lanesCanvas.getContext('2d');
-    if (!context || width <= 0) return;
+    const height = heightOf(labels);
+    element.hidden = labels.length === 0;
+    element.style.height = `${height * scale}px`;
+    const ratio = fitCanvas(element, this.width, height * scale) * scale;
+    const context = element.getContext('2d');
+    if (!context || width <= 0 || labels.length === 0) return;
     context.setTransform(ratio, 0, 0, ratio, 0, 0);
     context.clearRect(0, 0, width, height);
-    const whole = new LaneCanvas(context, palette(), this.range, width, 0, height);
-    this.drawBackground(whole);
+    this.drawBackground(new LaneCanvas(context, palette(), this.range, width, 0, height));
     let top = 0;
-    for (const lane of this.lanes) {
+    for (const { lane } of labels) {
       lane.draw(new LaneCanvas(context, palette(), this.range, width, top, lane.height));
       context.fillStyle = palette().line;
       context.fillRect(0, top + lane.height, width, laneGap);
       top += lane.height + laneGap;
     }
-    this.drawRuler(scale);
   }
 
   private drawBackground(canvas: LaneCanvas): void {
@@ -285,11 +375,17 @@ export class Timeline {
   /// A click goes there; dragging moves the lanes, or the time where all of it is in sight.
   private setUpLanes(): void {
     let started: Range = this.range;
+    let anchor: number | undefined;
     const isWhole = () => started.to - started.from >= this.duration;
     dragging(this.body, {
-      start: () => void (started = this.range),
-      click: (x) => this.events.onSeek(this.timeAt(x)),
+      start: (x, { shiftKey }) => {
+        started = this.range;
+        anchor = shiftKey ? this.timeAt(x) : undefined;
+      },
+      click: (x, { shiftKey }) =>
+        shiftKey ? this.events.onSelect(this.time, this.timeAt(x)) : this.events.onSeek(this.timeAt(x)),
       move: (x, way) => {
+        if (anchor !== undefined) return this.events.onSelect(anchor, this.timeAt(x));
         if (isWhole()) return this.events.onSeek(this.timeAt(x));
         const shift = (way / this.width) * (started.to - started.from);
         this.setRange({ from: started.from - shift, to: started.to - shift });
@@ -327,15 +423,22 @@ export class Timeline {
     this.pointerLine.hidden = this.tip.hidden = true;
   }
 
+  /// Pinned lanes lie over those that scroll.
+  private laneAt(place: number): Lane | undefined {
+    const { top, bottom } = this.pinnedCanvas.getBoundingClientRect();
+    const isPinned = place >= top && place < bottom;
+    const y = (place - (isPinned ? top : this.lanesCanvas.getBoundingClientRect().top)) / uiScale();
+    let end = 0;
+    return (isPinned ? this.pinned : this.others).find(({ lane }) => y < (end += lane.height + laneGap))?.lane;
+  }
+
   /// What the lane under the pointer tells at that time.
   private point(event: PointerEvent): void {
     if (event.pointerType === 'touch' || event.buttons !== 0) return this.pointNowhere();
     this.pointed = event;
     const box = this.body.getBoundingClientRect();
     const x = event.clientX - box.left;
-    const y = (event.clientY - box.top) / uiScale();
-    let bottom = 0;
-    const lane = this.lanes.find(({ height }) => y < (bottom += height + laneGap));
+    const lane = this.laneAt(event.clientY);
     const time = this.timeAt(x);
     this.pointerLine.hidden = this.tip.hidden = false;
     this.pointerLine.style.transform = `translateX(${x}px)`;
@@ -349,6 +452,10 @@ export class Timeline {
     const left = Math.min(event.clientX - root.left + 12, root.width - this.tip.offsetWidth - 8);
     this.tip.style.transform = `translate(${Math.max(4, left)}px, ${event.clientY - root.top - this.tip.offsetHeight - 10}px)`;
   }
+}
+
+function heightOf(labels: LaneLabel[]): number {
+  return labels.reduce((sum, { lane }) => sum + lane.height + laneGap, 0);
 }
 
 const idleEdge = 3; // pixels

@@ -11,7 +11,7 @@ function notice(place: string, message: string): Finding {
   return { severity: 'notice', place, message };
 }
 
-/// `movie` is the size of its pictures, where they can be shown.
+/// `movie` is the size of its pictures, or undefined if they cannot be shown.
 export function doubtsAbout(session: Session, movie: Size | undefined): Finding[] {
   return [...timeDoubts(session), ...regionDoubts(session, movie)];
 }

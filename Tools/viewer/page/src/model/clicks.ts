@@ -9,6 +9,9 @@ export interface Click {
   end: number;
   button: string;
   modifiers: string[];
+  /// Where the cursor was; not a number if that is not known.
+  x: number;
+  y: number;
 }
 
 const modifierSigns: Record<string, string> = { shift: '⇧', ctrl: '⌃', cmd: '⌘', alt: '⌥' };
@@ -21,6 +24,8 @@ export function clicksIn(table: Table | undefined): Click[] {
     end: track!.number('end', i),
     button: track!.text('button', i),
     modifiers: track!.text('modifiers', i).split('+').filter(Boolean),
+    x: track!.number('x', i),
+    y: track!.number('y', i),
   }));
 }
 

@@ -14,7 +14,7 @@ export function clock(seconds: number, digits = 3): string {
     : `${sign}${minutes}:${rest}${fraction}`;
 }
 
-/// For people who listen: "1 hour 2 minutes 3.5 seconds".
+/// Returns a time as a screen reader says it: "1 hour 2 minutes 3.5 seconds".
 export function spokenTime(seconds: number): string {
   const total = Math.round(seconds * 10) / 10;
   const unit = (count: number, name: string) => (count ? `${count} ${name}${count === 1 ? '' : 's'}` : '');

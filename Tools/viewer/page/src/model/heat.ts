@@ -29,7 +29,7 @@ export function heatOf(track: Track | undefined, placement: Placement, from: num
 
 const passes = 4; // from which on nobody sees the corners of the box any more
 
-/// By a small box in each direction, so often that every spot is round.
+/// Averages over a small box in each direction, several times, so that every spot becomes round.
 function softened(cells: Float32Array): Float32Array {
   for (let i = 0; i < passes; ++i) cells = boxed(boxed(cells, 1, heatWidth), heatWidth, heatHeight);
   return cells;

@@ -6,10 +6,10 @@ import { countBefore, countUntil } from './search';
 const together = 0.05; // seconds: what changes at once is one marker
 
 export function markersOf(session: Pick<Session, 'track' | 'clicks'>): Float64Array {
-  const times = session.clicks.map(({ start }) => start);
+  const all = session.clicks.map(({ start }) => start);
   for (const kind of ['topmostAppName', 'topmostWindowTitle', 'slideTitles'])
-    for (const time of session.track(kind)?.times ?? []) times.push(time);
-  times.sort((a, b) => a - b);
+    for (const time of session.track(kind)?.times ?? []) all.push(time);
+  const times = Float64Array.from(all).sort();
   const markers: number[] = [];
   for (const time of times)
     if (markers.length === 0 || time - markers[markers.length - 1]! > together) markers.push(time);

@@ -6,6 +6,9 @@ import { clicksIn, type Click } from './clicks';
 import { hasArea, type Point, type Rect } from './geometry';
 import { idleIn, type Stretch } from './idle';
 import { markersOf } from './markers';
+import { Extremes } from './extremes';
+import { mergedOf, type Merged } from './merged';
+import type { Prepared } from './prepared';
 import { speedOf, type Speed } from './speed';
 import { Track } from './track';
 
@@ -52,6 +55,8 @@ export interface Decoded {
   hidden: { stream: StreamSummary; entries: Entries | undefined }[];
   info: FileInfo;
   verify: FileCheck;
+  /// What the decoder's worker has worked out already.
+  prepared?: Prepared | undefined;
 }
 
 /// A stream that no reader finds. Nothing of it is drawn over the movie, where readers would not draw it either.
@@ -81,11 +86,14 @@ export class Session {
   readonly idle: Stretch[];
   /// Of the cursor.
   readonly speed: Speed;
+  readonly speedExtremes: Extremes;
   private readonly tracks = new Map<string, Track>();
+  private readonly prepared: Prepared | undefined;
   private readonly clearKeys: Track | undefined;
   private readonly maskedKeys: Track | undefined;
 
-  constructor(decoded: Decoded) {
+  /// `region` is what the reader says that the movie shows.
+  constructor(decoded: Decoded, region?: Rect) {
     this.name = decoded.name;
     this.container = decoded.container;
     this.streams = decoded.streams;
@@ -101,7 +109,7 @@ export class Session {
         ? 'A later stream of its kind takes its place.'
         : 'It lies behind damage, where readers do not look.',
     }));
-    this.region = this.recordedRegion();
+    this.region = region ?? this.recordedRegion();
     this.scaleFactor = this.lastNumber('recordingScaleFactor', 'scaleFactor') ?? 1;
     const { duration } = decoded;
     this.movieDuration = duration && Number.isFinite(duration) && duration > 0 ? duration : undefined;
@@ -110,11 +118,24 @@ export class Session {
     this.clicks = clicksIn(decoded.clicks);
     this.markers = markersOf(this).filter((time) => time >= 0 && time <= this.duration);
     this.idle = idleIn(decoded.idle, this.duration);
-    this.speed = speedOf(this.track('cursorLocation'));
+    this.prepared = decoded.prepared;
+    this.speed = decoded.prepared?.speed ?? speedOf(this.track('cursorLocation'));
+    this.speedExtremes = new Extremes(this.speed.values, decoded.prepared?.speedBounds);
   }
 
   track(kind: string): Track | undefined {
     return this.tracks.get(kind);
+  }
+
+  /// The extremes of the cursor's positions.
+  positionExtremes(column: 'x' | 'y'): Extremes {
+    const values = this.track('cursorLocation')?.values(column) ?? [];
+    return new Extremes(values, column === 'x' ? this.prepared?.xBounds : this.prepared?.yBounds);
+  }
+
+  /// The entries of all tracks by time.
+  merged(): Merged {
+    return this.prepared?.merged ?? mergedOf(this.allTracks());
   }
 
   allTracks(): Track[] {

@@ -25,8 +25,11 @@ export function speedOf(track: Track | undefined): Speed {
   if (!track || !x || !y) return { times: new Float64Array(), values: new Float32Array() };
   const { times, count } = track;
   const usual = usualDistance(times);
-  const starts = new Float64Array(2 * count);
-  const values = new Float32Array(2 * count);
+  const rests = (i: number) => times[i]! - times[i - 1]! > 2 * usual;
+  let length = count > 0 ? 1 : 0;
+  for (let i = 1; i < count; ++i) length += Number(rests(i)) + Number(times[i]! > times[i - 1]!);
+  const starts = new Float64Array(length);
+  const values = new Float32Array(length);
   let used = 0;
   const add = (time: number, value: number) => {
     starts[used] = time;
@@ -36,10 +39,10 @@ export function speedOf(track: Track | undefined): Speed {
     const [row, before] = [track.row(i), track.row(i - 1)];
     const passed = times[i]! - times[i - 1]!;
     const way = Math.hypot(Number(x[row]) - Number(x[before]), Number(y[row]) - Number(y[before]));
-    const rested = passed > 2 * usual;
+    const rested = rests(i);
     if (rested) add(times[i - 1]!, 0);
     if (passed > 0) add(rested ? times[i]! - usual : times[i - 1]!, way / (rested ? usual : passed));
   }
   if (count > 0) add(times[count - 1]!, 0);
-  return { times: starts.slice(0, used), values: values.slice(0, used) };
+  return { times: starts, values };
 }

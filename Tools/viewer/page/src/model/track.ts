@@ -8,7 +8,7 @@ export class Track {
   readonly kind: string;
   /// Ascending and finite.
   readonly times: Float64Array;
-  /// The rows of the stream, by time; null where the stream is in that order itself.
+  /// The rows of the stream in the order of their times; null if the stream is in that order itself.
   private readonly order: Uint32Array | null;
 
   constructor(readonly entries: Table) {
@@ -26,8 +26,20 @@ export class Track {
     return this.order ? this.order[index]! : index;
   }
 
+  /// The place of a row of the stream by time, or -1 if it has none.
+  place(row: number): number {
+    return this.order ? this.order.indexOf(row) : row;
+  }
+
   column(name: string): Table['columns'][string] | undefined {
     return this.entries.columns[name];
+  }
+
+  /// A column of numbers by time; what is none is NaN. It is the stream's own column if that has this order.
+  values(name: string): ArrayLike<number> {
+    const column = this.entries.columns[name];
+    const isOwn = !this.order && ArrayBuffer.isView(column) && !(column instanceof BigUint64Array);
+    return isOwn ? (column as ArrayLike<number>) : Float64Array.from(this.times, (_, i) => this.number(name, i));
   }
 
   number(name: string, index: number): number {

@@ -10,7 +10,7 @@ export class CursorImages {
   private recording = 0;
   onDecoded: () => void = () => {};
 
-  /// Undefined while it is being decoded, null where there is none that a browser can show.
+  /// Returns undefined while the image is being decoded, and null if there is none that a browser can show.
   image({ image }: Appearance): ImageBitmap | null | undefined {
     if (image.length === 0) return null;
     const known = this.images.get(image);

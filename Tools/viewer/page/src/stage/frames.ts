@@ -18,6 +18,11 @@ export class FrameLengths {
     return this.expected;
   }
 
+  /// Whether `length` was seen, and is no guess.
+  get isKnown(): boolean {
+    return this.measured.length > 0;
+  }
+
   /// Nothing lies between two pictures that begin at these times.
   follow(first: number, next: number): void {
     this.measured = [...this.measured, next - first].slice(-remembered);

@@ -13,6 +13,7 @@ import {
 import { heatHeight, heatWidth } from '../model/heat';
 import { countUntil } from '../model/search';
 import { rectAt, type Session } from '../model/session';
+import type { InsightTables } from '../insights/tables';
 import type { CursorImages } from './cursors';
 
 export interface Layer {
@@ -23,7 +24,7 @@ export interface Layer {
   isOn: boolean;
 }
 
-export type LayerId = 'cursor' | 'trail' | 'clicks' | 'captions' | 'hover' | 'window' | 'heat';
+export type LayerId = 'cursor' | 'trail' | 'clicks' | 'captions' | 'hover' | 'window' | 'heat' | 'zooms' | 'groups' | 'path';
 
 export const layers: Layer[] = [
   { id: 'cursor', name: 'Cursor', key: '1', isOn: true },
@@ -33,6 +34,9 @@ export const layers: Layer[] = [
   { id: 'window', name: 'Window on top', key: '5', isOn: true },
   { id: 'hover', name: 'Hover rectangle', key: '6', isOn: false },
   { id: 'heat', name: 'Heat map', key: '7', isOn: false },
+  { id: 'zooms', name: 'Suggested zoom', key: '8', isOn: false },
+  { id: 'groups', name: 'Groups of clicks', key: '9', isOn: false },
+  { id: 'path', name: 'Smooth path', key: 'p', isOn: false },
 ];
 
 export interface Scene {
@@ -42,6 +46,7 @@ export interface Scene {
   /// Pixels of the movie to a pixel of the page.
   unit: number;
   images: CursorImages;
+  insights: InsightTables;
   clickStarts: Float64Array;
   accent: string;
   font: string;
@@ -87,7 +92,7 @@ function outline(context: Context, { accent, unit }: Scene, rect: Rect, width: n
 }
 
 /// A name on the upper edge of a rectangle, kept inside the picture.
-function tag(context: Context, { unit, accent, font, placement }: Scene, rect: Rect, text: string): void {
+export function tag(context: Context, { unit, accent, font, placement }: Scene, rect: Rect, text: string): void {
   if (!text) return;
   const size = 11 * unit;
   context.font = `600 ${size}px ${font}`;

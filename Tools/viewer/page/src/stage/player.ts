@@ -1,6 +1,7 @@
 // Time that goes on: by the pictures of the movie where there is one, by the clock where there is none or it has ended.
 
 import type { Size } from '../model/geometry';
+import type { Range } from '../lanes/axis';
 import { FrameLengths, inside, nextFrame, previousFrame } from './frames';
 
 export type MovieState = 'none' | 'loading' | 'ready' | 'failed';
@@ -39,6 +40,13 @@ export class Player {
   /// The number of times that the reader went somewhere.
   private journeys = 0;
   private followsPicture = false;
+  /// How many times as fast as usual time goes back; 0 while it goes on, or stands still.
+  private backward = 0;
+  private target = 0;
+  /// What playing does not leave.
+  loop: Range | undefined;
+  /// Told while time goes on, before anything is drawn. Returns where to go on instead, if anywhere.
+  skip: (time: number) => number | undefined = () => undefined;
 
   constructor(readonly video: HTMLVideoElement) {
     this.watchFrames();
@@ -61,6 +69,12 @@ export class Player {
     if (url === null) this.video.removeAttribute('src');
     else this.video.src = url;
     this.video.load();
+    this.onChange();
+  }
+
+  /// Of what is recorded beside the movie, which stays the same.
+  setLength(duration: number, isGuessed: boolean): void {
+    [this.length, this.isGuessed] = [duration, isGuessed];
     this.onChange();
   }
 
@@ -103,18 +117,39 @@ export class Player {
     this.onChange();
   }
 
+  /// Below 0 while time goes back.
+  get speedShown(): number {
+    return this.isBackward ? -this.backward : this.speed;
+  }
+
+  get isBackward(): boolean {
+    return this.backward > 0;
+  }
+
   play(): void {
-    if (this.playing) return;
-    if (this.position >= this.duration - 0.01) this.seek(0);
+    if (this.playing && !this.isBackward) return;
+    this.backward = 0;
+    const { from, to } = this.loop ?? { from: 0, to: this.duration };
+    const isOutside = this.loop !== undefined && this.position < from;
+    if (isOutside || this.position >= to - 0.01) this.seek(from);
     [this.playing, this.followsPicture] = [true, true];
     this.lastTick = performance.now();
     this.playMovie();
     this.onChange();
   }
 
+  /// Time goes back, by the pictures that the movie can show on its way.
+  playBackward(speed: number): void {
+    this.video.pause();
+    if (!this.isBackward) this.target = this.position;
+    [this.playing, this.followsPicture, this.backward] = [true, false, speed];
+    this.lastTick = performance.now();
+    this.onChange();
+  }
+
   pause(): void {
     if (!this.playing) return;
-    this.playing = false;
+    [this.playing, this.backward] = [false, 0];
     this.video.pause();
     this.onChange();
   }
@@ -125,8 +160,8 @@ export class Player {
   }
 
   seek(time: number): void {
-    this.position = this.limited(time);
-    [this.steps, this.followsPicture] = [0, this.playing];
+    this.position = this.target = this.limited(time);
+    [this.steps, this.followsPicture] = [0, this.playing && !this.isBackward];
     ++this.journeys;
     if (this.movie === 'ready') this.seekMovie(inside(this.position));
     if (this.playing) this.playMovie();
@@ -150,11 +185,36 @@ export class Player {
     const passed = (now - this.lastTick) / 1000;
     this.lastTick = now;
     if (!this.playing) return;
+    if (this.isBackward) return this.goBack(passed);
     if (this.isMovieRunning()) this.position = this.runningTime(now);
     else if (this.wanted === undefined) this.position += Math.max(0, passed) * this.speed;
+    const elsewhere = this.loop && this.position >= this.loop.to ? this.loop.from : this.skip(this.position);
+    if (elsewhere !== undefined) return this.seek(elsewhere);
     if (this.position < this.duration) return;
     this.position = this.duration;
     this.pause();
+  }
+
+  /// Shows the picture that the clock has reached as soon as the one before has been found.
+  private goBack(passed: number): void {
+    this.target = this.limited(this.target - Math.max(0, passed) * this.backward);
+    if (this.movie !== 'ready' || this.target > this.movieLength()) this.position = this.target;
+    else if (this.wanted === undefined && !(this.target >= this.picture)) this.seekMovie(inside(this.target));
+    if (this.target > 0) return;
+    this.pause();
+    this.seek(0);
+  }
+
+  /// Finds out how long a picture lasts, as far as the movie can show it. Resolves with the length in seconds.
+  async frameLength(): Promise<number> {
+    if (this.movie === 'ready' && !this.lengths.isKnown && !this.isStepping) {
+      this.pause();
+      this.seek(0);
+      await this.arrival();
+      this.steps = 1;
+      if (!Number.isNaN(this.picture)) await this.takeSteps();
+    }
+    return this.lengths.length;
   }
 
   private limited(time: number): number {
@@ -215,7 +275,8 @@ export class Player {
     this.picture = began;
     [this.shownAt, this.droppedBefore] = [performance.now(), this.dropped()];
     this.hasSought = true;
-    if (this.followsPicture && this.wanted === undefined && !this.video.ended)
+    if (this.isBackward) this.position = this.limited(began + rounding);
+    else if (this.followsPicture && this.wanted === undefined && !this.video.ended)
       this.position = this.limited(began + rounding);
     if (this.wanted !== undefined && !this.video.seeking) this.arriveOrGoOn();
     this.onPicture();
@@ -232,7 +293,7 @@ export class Player {
   }
 
   private playMovie(): void {
-    if (this.movie !== 'ready' || this.position >= this.movieLength()) return;
+    if (this.movie !== 'ready' || this.isBackward || this.position >= this.movieLength()) return;
     this.video.playbackRate = this.speed;
     this.video.play().catch(() => {}); // the clock goes on without it
   }
@@ -289,7 +350,7 @@ export class Player {
   }
 
   private moviePaused(): void {
-    const isStrange = this.playing && !this.video.ended && this.wanted === undefined;
+    const isStrange = this.playing && !this.isBackward && !this.video.ended && this.wanted === undefined;
     if (isStrange) this.pause(); // by a media key, say
   }
 }

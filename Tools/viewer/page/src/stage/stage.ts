@@ -7,6 +7,8 @@ import type { Session } from '../model/session';
 import { byId, fitCanvas, make } from '../ui/dom';
 import { palette } from '../ui/palette';
 import { uiScale } from '../ui/scale';
+import { drawGroup, drawPath, drawZoom } from '../insights/draw';
+import type { InsightTables } from '../insights/tables';
 import { CursorImages } from './cursors';
 import {
   drawClicks,
@@ -20,11 +22,14 @@ import {
   type Scene,
 } from './layers';
 import type { Player } from './player';
+import { drawCaption, pngOf } from './still';
+import { StageZoom } from './zoom';
 
 const reducedMotion = matchMedia('(prefers-reduced-motion: reduce)');
 
 export class Stage {
   readonly images = new CursorImages();
+  readonly zoom = new StageZoom();
   placement: Placement = placementOf(undefined, 1, undefined);
   showsKeys = false;
   private session: Session | undefined;
@@ -39,7 +44,10 @@ export class Stage {
   private readonly canvas = byId<HTMLCanvasElement>('overlay');
   private readonly caption = byId('caption');
 
-  constructor(private readonly player: Player) {
+  constructor(
+    private readonly player: Player,
+    private readonly insights: InsightTables,
+  ) {
     new ResizeObserver(() => this.lay()).observe(this.element);
   }
 
@@ -68,6 +76,8 @@ export class Stage {
     });
     this.width = place.width;
     this.frame.classList.toggle('has-movie', movie === 'ready');
+    const { scale, x, y } = this.zoom;
+    this.player.video.style.transform = scale > 1 ? `scale(${scale}) translate(${-100 * x}%, ${-100 * y}%)` : '';
     fitCanvas(this.picture, place.width, place.height);
     fitCanvas(this.canvas, place.width, place.height);
     this.drawPicture();
@@ -81,7 +91,21 @@ export class Stage {
     if (movie !== 'ready' || !('requestVideoFrameCallback' in video)) return void (this.picture.hidden = true);
     if (video.readyState < HTMLMediaElement.HAVE_CURRENT_DATA) return; // the picture before stays
     this.picture.hidden = false;
-    this.picture.getContext('2d', { alpha: false })?.drawImage(video, 0, 0, this.picture.width, this.picture.height);
+    const { scale, x, y } = this.zoom;
+    const { videoWidth, videoHeight } = video;
+    this.picture
+      .getContext('2d', { alpha: false })
+      ?.drawImage(
+        video,
+        x * videoWidth,
+        y * videoHeight,
+        videoWidth / scale,
+        videoHeight / scale,
+        0,
+        0,
+        this.picture.width,
+        this.picture.height,
+      );
   }
 
   /// The heat map tells of this range of time.
@@ -96,29 +120,52 @@ export class Stage {
     const { frame } = this.placement;
     context.setTransform(1, 0, 0, 1, 0, 0);
     context.clearRect(0, 0, canvas.width, canvas.height);
-    context.setTransform(canvas.width / frame.width, 0, 0, canvas.height / frame.height, 0, 0);
-    const scene: Scene = {
+    const { scale, x, y } = this.zoom;
+    const [across, down] = [(scale * canvas.width) / frame.width, (scale * canvas.height) / frame.height];
+    context.setTransform(across, 0, 0, down, -x * scale * canvas.width, -y * scale * canvas.height);
+    this.drawLayers(context, this.sceneAt(session, time, (frame.width / this.width / scale) * uiScale()));
+    this.showCaption(time);
+  }
+
+  private sceneAt(session: Session, time: number, unit: number): Scene {
+    return {
       session,
       placement: this.placement,
       time,
-      unit: (frame.width / this.width) * uiScale(),
+      unit,
       images: this.images,
+      insights: this.insights,
       clickStarts: this.clickStarts,
       accent: '#3d7bff',
       font: palette().font,
       isStill: reducedMotion.matches,
     };
-    this.drawLayers(context, scene);
-    this.showCaption(time);
+  }
+
+  /// The movie's picture and everything over it, as large as the movie. Rejects if the browser does not let the page
+  /// read the picture.
+  async still(): Promise<Blob> {
+    const { frame } = this.placement;
+    const canvas = make('canvas', { width: Math.round(frame.width), height: Math.round(frame.height) });
+    const context = canvas.getContext('2d');
+    const { session, player } = this;
+    if (!session || !context) throw new Error('nothing is open');
+    if (player.movie === 'ready') context.drawImage(player.video, 0, 0, canvas.width, canvas.height);
+    this.drawLayers(context, this.sceneAt(session, player.time, Math.max(1, frame.width / 1280)));
+    drawCaption(context, this.captionAt(player.time), frame, palette().font);
+    return pngOf(canvas);
   }
 
   private drawLayers(context: CanvasRenderingContext2D, scene: Scene): void {
     const isOn = (id: LayerId) => layers.some((layer) => layer.id === id && layer.isOn);
     byId('heat-legend').hidden = !isOn('heat');
     if (isOn('heat')) drawHeat(context, scene, this.heatPicture());
+    if (isOn('zooms')) drawZoom(context, scene);
     if (isOn('window')) drawWindow(context, scene);
     if (isOn('hover')) drawHover(context, scene);
     if (isOn('trail') && !scene.isStill) drawTrail(context, scene);
+    if (isOn('path')) drawPath(context, scene);
+    if (isOn('groups')) drawGroup(context, scene);
     if (isOn('clicks')) drawClicks(context, scene);
     if (isOn('cursor')) drawCursor(context, scene);
   }

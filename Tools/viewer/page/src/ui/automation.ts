@@ -11,6 +11,11 @@ export interface ViewerState {
   time: number;
   duration: number;
   playing: boolean;
+  /// Below 0 while time goes back.
+  speed: number;
+  selection: { from: number; to: number } | null;
+  /// How many times larger than the whole picture the movie is shown.
+  zoom: number;
   /// Whether the picture of `time` is shown.
   isSettled: boolean;
   movie: string;
@@ -29,7 +34,7 @@ declare global {
   };
 }
 
-function stateOf({ session, player, stage, finished }: Page): ViewerState {
+function stateOf({ session, player, stage, selection, finished }: Page): ViewerState {
   const position = session?.cursorAt(player.time);
   return {
     isOpen: session !== undefined,
@@ -37,6 +42,9 @@ function stateOf({ session, player, stage, finished }: Page): ViewerState {
     time: player.time,
     duration: player.duration,
     playing: player.playing,
+    speed: player.speedShown,
+    selection: selection.range ?? null,
+    zoom: stage.zoom.scale,
     isSettled: player.isSettled,
     movie: player.movie,
     frame: stage.placement.frame,

@@ -3,15 +3,17 @@
 import { clock, spokenTime } from '../model/format';
 import { layers } from '../stage/layers';
 import { byId, make, setText } from './dom';
+import { rates } from '../transport/shuttle';
+import { setUpClock } from '../transport/clock';
+import { setUpStage } from '../stage/handling';
 import { setIcon } from './icons';
+import { setUpMenu } from './menu';
 import type { Page } from './page';
 
 export interface Controls {
   showState(): void;
   showTime(time: number, duration: number): void;
 }
-
-const rates = [0.25, 0.5, 1, 1.5, 2, 4];
 
 export function setUpControls(page: Page): Controls {
   const on = (id: string, action: () => void) => byId(id).addEventListener('click', action);
@@ -26,7 +28,15 @@ export function setUpControls(page: Page): Controls {
   on('full-screen', () => void switchFullScreen());
   const scrubber = byId<HTMLInputElement>('scrubber');
   scrubber.addEventListener('input', () => page.seek(scrubber.valueAsNumber));
-  byId('frame').addEventListener('click', () => page.player.toggle());
+  on('skip-idle', () => page.switchSkipping());
+  on('movie-in', () => page.zoomMovie(1.5));
+  on('movie-out', () => page.zoomMovie(1 / 1.5));
+  on('movie-fit', () => page.zoomMovie(0));
+  on('save-still', () => page.saveStill());
+  on('select-some', () => page.selectSome());
+  setUpMenu('more-button', 'more-menu');
+  setUpClock(page);
+  setUpStage(page);
   document.addEventListener('fullscreenchange', () => showTime(page.player.time, page.player.duration));
   const boxes = setUpLayers(page);
   return { showState: () => showState(page, boxes), showTime };
@@ -42,7 +52,6 @@ export async function switchFullScreen(): Promise<void> {
 }
 
 function setUpLayers(page: Page): HTMLInputElement[] {
-  const button = byId('layers-button');
   const menu = byId('layers-menu');
   const boxes = layers.map(({ id, name, key }) => {
     const box = make('input', { type: 'checkbox', class: 'switch', role: 'switch' });
@@ -50,27 +59,17 @@ function setUpLayers(page: Page): HTMLInputElement[] {
     menu.append(make('label', { class: 'menu-item' }, make('span', {}, name), make('kbd', {}, key), box));
     return box;
   });
-  const show = (isOpen: boolean) => {
-    menu.hidden = !isOpen;
-    button.setAttribute('aria-expanded', String(isOpen));
-  };
-  button.addEventListener('click', () => show(menu.hidden));
-  document.addEventListener('pointerdown', (event) => {
-    if (!(event.target as Element).closest('.menu-holder')) show(false);
-  });
-  document.addEventListener('keydown', (event) => {
-    if (event.key !== 'Escape' || menu.hidden) return;
-    if (menu.contains(document.activeElement)) button.focus();
-    show(false);
-  });
+  setUpMenu('layers-button', 'layers-menu');
   return boxes;
 }
 
-function showState({ player, stage }: Page, boxes: HTMLInputElement[]): void {
+function showState({ player, stage, skipsIdle }: Page, boxes: HTMLInputElement[]): void {
   setIcon(byId('play'), player.playing ? 'pause' : 'play');
   byId('play').setAttribute('aria-label', player.playing ? 'Pause' : 'Play');
-  setText(byId('rate'), `${player.rate}×`);
-  byId('rate').setAttribute('aria-label', `Speed ${player.rate}`);
+  const speed = `${player.speedShown}`.replace('-', '−');
+  setText(byId('rate'), `${speed}×`);
+  byId('rate').setAttribute('aria-label', `Speed ${speed}`);
+  byId<HTMLInputElement>('skip-idle').checked = skipsIdle;
   setIcon(byId('sound'), player.muted ? 'soundOff' : 'sound');
   byId('sound').setAttribute('aria-pressed', String(!player.muted));
   byId<HTMLButtonElement>('sound').disabled = player.movie !== 'ready';

@@ -8,15 +8,25 @@ const keys: [string, string][] = [
   ['space', 'Play or pause'],
   ['← →', 'One second back or on; ten with Shift'],
   [', .', 'One frame back or on'],
+  ['j k l', 'Play back, stop, play on; again is faster, up to 16 times'],
+  ['g', 'Go to a time such as 1:23.5, or to a picture such as #120'],
   ['[ ]', 'Previous or next marker: click, window, slide'],
   ['Home End', 'To the start or the end'],
   ['+ − 0', 'Zoom the lanes in or out, show all'],
   ['< >', 'Move the lanes back or on'],
+  ['a', 'Arrange the lanes: hide, move, resize, pin'],
+  ['b', 'Write a note at the playhead'],
   ['/', 'Filter the entries'],
   ['n N', 'Next or previous match'],
   ['Ctrl C', 'Copy the selected entries as CSV; Esc selects none'],
-  ['k', 'Show or mask the keys that were typed'],
+  ['i o', 'The selection begins or ends here'],
+  ['Shift ← →', 'In the timeline: select; with Home or End up to there'],
+  ['r Esc', 'Play the selection again and again; select nothing'],
+  ['s', 'Skip times in which nothing was done'],
+  ['z Z', 'Zoom the movie in or out; arrow keys move it'],
+  ['t', 'Show or mask the keys that were typed'],
   ['1 – 7', 'Switch a layer: cursor, clicks, keys, trail, window, hover, heat map'],
+  ['8 9 p', 'Switch a layer: suggested zoom, groups of clicks, smooth path'],
   ['m', 'Sound on or off'],
   ['f', 'Full screen'],
   ['?', 'This help'],
@@ -26,7 +36,10 @@ const gestures: [string, string][] = [
   ['Wheel', 'Scroll; with Ctrl zoom the lanes at the pointer, with Shift move them'],
   ['Drag', 'Move the lanes, or the playhead where all is in sight'],
   ['Click', 'Go there, in a lane or in the table'],
-  ['Link', 'Add #t=12.5 to the address to open at a time'],
+  ['Drag', 'The name of a lane to another place, or the edge below it to another height'],
+  ['Link', 'The address holds the time, the range, the zoom, the stream, the filter and the layers'],
+  ['Shift drag', 'Select a range of time, in the lanes or the ruler'],
+  ['Ctrl wheel', 'Over the movie: zoom it; drag moves it then'],
 ];
 
 function rows(entries: [string, string][]): HTMLElement {
@@ -40,7 +53,7 @@ function rows(entries: [string, string][]): HTMLElement {
   );
 }
 
-function fill(dialog: HTMLDialogElement, id: string, title: string, ...content: Node[]): void {
+export function fillDialog(dialog: HTMLDialogElement, id: string, title: string, ...content: Node[]): void {
   const close = make('button', { type: 'button', class: 'button is-icon', 'aria-label': 'Close' });
   setIcon(close, 'close');
   close.addEventListener('click', () => dialog.close());
@@ -48,9 +61,9 @@ function fill(dialog: HTMLDialogElement, id: string, title: string, ...content: 
     make('div', { class: 'dialog-head' }, make('h2', { id }, title), close),
     make('div', { class: 'dialog-body' }, ...content),
   );
-  dialog.addEventListener('click', (event) => {
+  dialog.onclick = (event) => {
     if (event.target === dialog) dialog.close(); // beside it
-  });
+  };
 }
 
 function aboutContent(): Node[] {
@@ -88,8 +101,8 @@ function aboutContent(): Node[] {
 export function setUpDialogs(): void {
   const help = byId<HTMLDialogElement>('help-dialog');
   const about = byId<HTMLDialogElement>('about-dialog');
-  fill(help, 'help-title', 'Keys and gestures', rows(keys), make('h3', {}, 'Pointer'), rows(gestures));
-  fill(about, 'about-title', 'About this page', ...aboutContent());
+  fillDialog(help, 'help-title', 'Keys and gestures', rows(keys), make('h3', {}, 'Pointer'), rows(gestures));
+  fillDialog(about, 'about-title', 'About this page', ...aboutContent());
   byId('help-button').addEventListener('click', showHelp);
   byId('about-button').addEventListener('click', () => about.showModal());
 }
@@ -110,7 +123,7 @@ export function ask(title: string, text: string, yes: string): Promise<boolean> 
       });
       return element;
     };
-    fill(
+    fillDialog(
       dialog,
       'confirm-title',
       title,

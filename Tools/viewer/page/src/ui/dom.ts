@@ -21,7 +21,7 @@ export function make<Tag extends keyof HTMLElementTagNameMap>(
   return element;
 }
 
-/// Only where it is another text: the page is laid out less often.
+/// Changes nothing if the text is the same, so that the page is laid out less often.
 export function setText(element: HTMLElement, text: string): void {
   if (element.textContent !== text) element.textContent = text;
 }

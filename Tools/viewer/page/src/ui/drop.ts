@@ -2,7 +2,7 @@
 
 import { byId } from './dom';
 
-export function setUpDrop(onFile: (file: File) => void): void {
+export function setUpDrop(onFiles: (files: File[]) => void): void {
   const veil = byId('drop-veil');
   const input = byId<HTMLInputElement>('file-input');
   const hasFiles = (event: DragEvent) => event.dataTransfer?.types.includes('Files') ?? false;
@@ -20,13 +20,13 @@ export function setUpDrop(onFile: (file: File) => void): void {
   window.addEventListener('drop', (event) => {
     event.preventDefault();
     show((depth = 0) > 0);
-    const file = event.dataTransfer?.files[0];
-    if (file) onFile(file);
+    const files = [...(event.dataTransfer?.files ?? [])];
+    if (files.length > 0) onFiles(files);
   });
   input.addEventListener('change', () => {
-    const file = input.files?.[0];
+    const files = [...(input.files ?? [])];
     input.value = '';
-    if (file) onFile(file);
+    if (files.length > 0) onFiles(files);
   });
   for (const id of ['open-button', 'welcome-open']) byId(id).addEventListener('click', () => input.click());
 }

@@ -28,6 +28,12 @@ const paths: Record<string, string> = {
   fit: '<path d="M3 6v8M17 6v8M6 10h8M6 10l2-2M6 10l2 2M14 10l-2-2M14 10l-2 2"/>',
   plus: '<path d="M10 4.500v11M4.500 10h11"/>',
   minus: '<path d="M4.500 10h11"/>',
+  pin: '<path d="M7 3h6l-1 5 3 3H5l3-3zM10 11v6"/>',
+  lanes: '<path d="M3 5h14M3 10h9M3 15h12"/>',
+  more: '<circle cx="4.500" cy="10" r="1.200" fill="currentColor"/><circle cx="10" cy="10" r="1.200" fill="currentColor"/><circle cx="15.500" cy="10" r="1.200" fill="currentColor"/>',
+  loop: '<path d="M5 12.500H4a2 2 0 0 1-2-2V8.500a3 3 0 0 1 3-3h9M11.500 3l2.500 2.500L11.500 8M15 7.500h1a2 2 0 0 1 2 2v2a3 3 0 0 1-3 3H6M8.500 17 6 14.500 8.500 12"/>',
+  heat: '<path d="M10 2.500c1 3 4.500 4.500 4.500 9a4.500 4.500 0 0 1-9 0c0-2 1-3 1.800-4 .4 1.300 1 2 1.700 2.200C9 7.500 9 4.500 10 2.500z"/>',
+  link: '<path d="M8.500 11.500a3 3 0 0 0 4.300 0l3-3a3 3 0 0 0-4.300-4.300l-1 1M11.500 8.500a3 3 0 0 0-4.300 0l-3 3a3 3 0 0 0 4.300 4.300l1-1"/>',
   good: '<circle cx="10" cy="10" r="7.500"/><path d="m6.500 10.200 2.400 2.400 4.600-5"/>',
   bad: '<path d="M10 3 18 16.500H2z"/><path d="M10 8v4"/><circle cx="10" cy="14.300" r=".5" fill="currentColor"/>',
 };

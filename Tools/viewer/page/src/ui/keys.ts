@@ -1,5 +1,7 @@
 // What keys do, wherever nobody is writing.
 
+import { shuttleBack, shuttleOn, shuttleStop } from '../transport/shuttle';
+import { editClock } from '../transport/clock';
 import { layers } from '../stage/layers';
 import { switchFullScreen } from './controls';
 import { showHelp } from './dialogs';
@@ -22,10 +24,23 @@ export function setUpKeys(page: Page): void {
     '0': () => page.zoom(0),
     '<': () => page.pan(-0.25),
     '>': () => page.pan(0.25),
+    a: () => page.arrangeLanes(),
+    b: () => page.writeNote(),
     '/': () => page.findEntries(),
     n: () => page.stepMatch(1),
     N: () => page.stepMatch(-1),
-    k: () => page.switchKeys(),
+    j: () => shuttleBack(page.player),
+    k: () => shuttleStop(page.player),
+    l: () => shuttleOn(page.player),
+    i: () => page.selection.setIn(page.player.time),
+    o: () => page.selection.setOut(page.player.time),
+    r: () => page.switchLoop(),
+    s: () => page.switchSkipping(),
+    g: () => editClock(page),
+    z: () => page.zoomMovie(1.5),
+    Z: () => page.zoomMovie(1 / 1.5),
+    t: () => page.switchKeys(),
+    Escape: () => page.selection.clear(),
     m: () => void (page.player.muted = !page.player.muted),
     f: () => void switchFullScreen(),
     '?': showHelp,
@@ -62,5 +77,6 @@ function usesKey({ target, key }: KeyboardEvent): boolean {
   if (element.closest('dialog[open]')) return true;
   if (element.matches('input[type="range"]')) return /^(Arrow|Home|End|Page)/.test(key);
   if (element.matches('input:not([type="checkbox"]), textarea, select')) return true;
+  if (key === 'Escape' && element.closest('.table')) return true;
   return key === ' ' && element !== clicked && element.matches('button, input, summary');
 }

@@ -2,6 +2,7 @@
 
 import type { Decoder } from '../decoder/client';
 import type { Session } from '../model/session';
+import type { Selection } from '../range/selection';
 import type { Player } from '../stage/player';
 import type { Stage } from '../stage/stage';
 
@@ -9,6 +10,9 @@ export interface Page {
   readonly player: Player;
   readonly stage: Stage;
   readonly decoder: Decoder;
+  readonly selection: Selection;
+  /// Whether playing goes on after times in which nothing was done.
+  skipsIdle: boolean;
   readonly session: Session | undefined;
   /// The number of files that were opened or refused.
   readonly finished: number;
@@ -24,4 +28,13 @@ export interface Page {
   switchLayer(id: string): void;
   switchKeys(): void;
   findEntries(): void;
+  arrangeLanes(): void;
+  writeNote(): void;
+  /// 0 shows the whole picture.
+  zoomMovie(factor: number): void;
+  switchLoop(): void;
+  switchSkipping(): void;
+  saveStill(): void;
+  /// Selects a part of what the lanes show.
+  selectSome(): void;
 }

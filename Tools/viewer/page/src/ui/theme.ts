@@ -2,30 +2,19 @@
 
 import { announce, byId } from './dom';
 import { forgetPalette } from './palette';
+import { store, stored } from './storage';
 
 const key = 'zulm-theme';
 const darkSystem = matchMedia('(prefers-color-scheme: dark)');
 
 type Choice = 'system' | 'dark' | 'light';
 
-function stored(): Choice {
-  try {
-    const choice = localStorage.getItem(key);
-    return choice === 'dark' || choice === 'light' ? choice : 'system';
-  } catch {
-    return 'system'; // pages from a disk may have no storage
-  }
+function storedChoice(): Choice {
+  const choice = stored(key);
+  return choice === 'dark' || choice === 'light' ? choice : 'system';
 }
 
-function store(choice: Choice): void {
-  try {
-    localStorage.setItem(key, choice);
-  } catch {
-    // it holds for this visit
-  }
-}
-
-let choice = stored();
+let choice = storedChoice();
 
 function apply(onChange: () => void): void {
   const isDark = choice === 'system' ? darkSystem.matches : choice === 'dark';
@@ -41,7 +30,7 @@ export function setUpTheme(onChange: () => void): void {
   darkSystem.addEventListener('change', () => apply(onChange));
   byId('theme-button').addEventListener('click', () => {
     choice = document.documentElement.dataset.theme === 'dark' ? 'light' : 'dark';
-    store(choice);
+    store(key, choice);
     apply(onChange);
     announce(`${choice} theme`);
   });

@@ -1,0 +1,19 @@
+// What the browser keeps from one visit to the next. Pages from a disk may have no storage: then it holds for this one.
+
+export function stored(key: string): string | null {
+  try {
+    return localStorage.getItem(key);
+  } catch {
+    return null;
+  }
+}
+
+/// Null forgets it.
+export function store(key: string, value: string | null): void {
+  try {
+    if (value === null) localStorage.removeItem(key);
+    else localStorage.setItem(key, value);
+  } catch {
+    // it holds for this visit
+  }
+}
