@@ -25,7 +25,10 @@ void Composer::drawMovie(const FilmTime& time, const View& view) {
     const YuvPicture& decoded = pictures_.at(time.source);
     const double begin = processorTime();
     YuvPicture picture = decoded;
-    const bool isCovered = cover_.picture && cover_.picture(picture, time.source);
+    const double taken = pictures_.pictureTime(); // which is later if the movie begins late or cannot be sought in
+    bool isCovered = cover_.picture && cover_.picture(picture, time.source);
+    if (cover_.picture && taken > time.source)
+        isCovered = cover_.picture(picture, taken) || isCovered;
     const PicturePart part = view.partOf(picture.width(), picture.height());
     if (isCovered || shownPicture_ != pictures_.pictureNumber() || part != shownPart_) {
         resample(picture, part, base_, stage_.frame());

@@ -17,6 +17,7 @@
 #include <algorithm>
 #include <ctime>
 #include <filesystem>
+#include <set>
 
 namespace Render {
 
@@ -62,14 +63,6 @@ void attachStreams(Production& production, const std::string& movie, const std::
     }
 }
 
-ExitCode complainAbout(const EditedRecording& edited, const std::string& recording) {
-    for (const std::string& warning : edited.warnings)
-        Zulm::warn(fmt::format("{}: {}", recording, warning));
-    for (const std::string& loss : edited.losses)
-        Zulm::complain(fmt::format("{}: {}", recording, loss));
-    return edited.losses.empty() ? Zulm::ExitFine : Zulm::ExitDamaged;
-}
-
 /// How much of the work was drawing. The times are those of processors, so that other programs do not count.
 void sayTimes(const Composer& composer, double length) {
     timespec time{};
@@ -107,7 +100,7 @@ ExitCode renderFilm(const RenderOptions& options, Production& production, const 
         Zulm::writeOutput(fmt::format("{}: {:.3f} s, {} x {}, {} stream{}\n", options.output, length,
                                       production.size().width, production.size().height, edited.streams.size(),
                                       edited.streams.size() == 1 ? "" : "s"));
-    return complainAbout(edited, options.recording);
+    return production.complain();
 }
 
 ExitCode renderGif(const RenderOptions& options, Production& production) {
@@ -124,23 +117,30 @@ ExitCode renderGif(const RenderOptions& options, Production& production) {
                [&writer](const YuvPicture& picture, double) { writer.writePicture(picture); });
     writer.finish();
     output.commit();
-    return Zulm::ExitFine;
+    return production.complain();
 }
 
 ExitCode renderStills(const RenderOptions& options, Production& production) {
     namespace fs = std::filesystem;
     const TimeMap& times = production.session().times();
-    Zulm::createFolder(options.frames);
     std::vector<std::string> paths;
     for (const double time : options.at) {
         if (time > times.duration())
             throw Failure(fmt::format("--at {}: the film ends at {:.3f} s", time, times.duration()));
         paths.push_back((fs::path(options.frames) / fmt::format("frame-{:09.3f}.png", time)).string());
     }
+    if (std::set<std::string>(paths.begin(), paths.end()).size() < paths.size())
+        throw Failure("--at: two of the times are less than a millisecond apart, and would have one file");
     Zulm::requireFree(paths, options.force);
-    for (std::size_t i = 0; i < paths.size(); ++i)
+    WrittenFiles written(options.frames);
+    const Zulm::NotedSignals noted;
+    for (std::size_t i = 0; i < paths.size(); ++i) {
+        Zulm::NotedSignals::check();
         writePng(production.composer().frameAt(times.at(options.at[i])), paths[i], options.recording, true);
-    return Zulm::ExitFine;
+        written.add(paths[i]);
+    }
+    written.keep();
+    return production.complain();
 }
 
 } // namespace

@@ -45,6 +45,7 @@ std::vector<double> movesIn(const Track<CursorLocationKind>& positions, const st
 InsightOptions optionsOf(const Style& style) {
     InsightOptions options;
     options.captions.showsKeys = style.keys.display == KeyDisplay::Shown;
+    options.captions.showsShortcuts = true;
     options.zooms.factor = style.zoom.factor;
     options.camera.settleTime = style.zoom.settleTime;
     options.camera.followsCursor = style.zoom.followsCursor;

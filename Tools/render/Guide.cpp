@@ -125,6 +125,13 @@ std::string sentenceOf(const GuideStep& step) {
     return step.where.empty() ? step.words : fmt::format("{} — {}", step.words, step.where);
 }
 
+/// Removes the pictures that an older guide with more steps has left. They may show what is covered by now.
+void removeOlderPictures(const fs::path& folder, std::size_t steps) {
+    std::error_code ignored;
+    for (std::size_t i = steps; fs::remove(folder / pictureName(i), ignored); ++i) {
+    }
+}
+
 constexpr auto s_htmlHead = R"(<!DOCTYPE html>
 <html lang="en">
 <head>
@@ -179,6 +186,7 @@ std::vector<GuideStep> stepsOf(const Recording& recording, double duration, bool
     }
     KeyCaptionOptions options;
     options.showsKeys = showsTyped;
+    options.showsShortcuts = true;
     for (const KeyCaption& caption : keyCaptions(sources.keys, options))
         steps.push_back({caption.keys.back().time, wordsFor(caption, showsTyped), {}});
     std::erase_if(steps, [duration](const GuideStep& step) { return step.time < 0 || step.time > duration; });
@@ -197,12 +205,12 @@ Zulm::ExitCode makeGuide(const GuideOptions& options) {
     if (steps.empty())
         throw Zulm::Failure(
             fmt::format("{}: has neither clicks nor keys, of which a guide could tell", options.recording));
-    Zulm::createFolder(options.folder);
     const fs::path folder(options.folder);
     std::vector<std::string> paths{(folder / "guide.html").string(), (folder / "guide.md").string()};
     for (std::size_t i = 0; i < steps.size(); ++i)
         paths.push_back((folder / pictureName(i)).string());
     Zulm::requireFree(paths, options.force);
+    WrittenFiles written(options.folder);
     const Zulm::NotedSignals noted;
     Zulm::Progress progress("drawing the steps of " + options.recording, steps.size(),
                             [](std::uint64_t count) { return fmt::format("{}", count); });
@@ -210,14 +218,18 @@ Zulm::ExitCode makeGuide(const GuideOptions& options) {
         Zulm::NotedSignals::check();
         const FilmTime time = production.session().times().at(steps[i].time);
         writePng(production.composer().stillAt(time), paths[i + 2], options.recording, true);
+        written.add(paths[i + 2]);
         progress.moveTo(i + 1);
     }
     const std::string title = fs::path(options.recording).stem().string();
     Zulm::writeWholeFile(paths[0], htmlOf(steps, title), {options.recording}, true);
+    written.add(paths[0]);
     Zulm::writeWholeFile(paths[1], markdownOf(steps, title), {options.recording}, true);
+    written.keep();
+    removeOlderPictures(folder, steps.size());
     if (!Zulm::settings().quiet)
         Zulm::writeOutput(fmt::format("{}: {} step{}\n", options.folder, steps.size(), steps.size() == 1 ? "" : "s"));
-    return Zulm::ExitFine;
+    return production.complain();
 }
 
 } // namespace Render

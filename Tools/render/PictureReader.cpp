@@ -98,9 +98,13 @@ bool PictureReader::send() {
         const int error = av_read_frame(movie_.input.get(), packet.get());
         if (error < 0) {
             isFlushing_ = true;
+            isUnreadable_ = error != AVERROR_EOF;
             return avcodec_send_packet(decoder_.get(), nullptr) >= 0;
         }
         if (packet->stream_index == stream_) {
+            if (packet->pts != AV_NOPTS_VALUE)
+                packetsEnd_ = std::max(packetsEnd_, static_cast<double>(packet->pts + packet->duration) *
+                                                        av_q2d(movie_.input->streams[stream_]->time_base));
             avcodec_send_packet(decoder_.get(), packet.get()); // what is damaged shows as a picture that is missing
             return true;
         }
@@ -134,11 +138,26 @@ void PictureReader::seek(double time) {
     isFlushing_ = false;
 }
 
+void PictureReader::noteEnd(double time) {
+    constexpr double least = 0.5; // seconds; many movies tell a little more than they have
+    const AVStream& stream = *movie_.input->streams[stream_];
+    double end = 0;
+    if (stream.duration > 0) {
+        const std::int64_t start = stream.start_time == AV_NOPTS_VALUE ? 0 : stream.start_time;
+        end = static_cast<double>(start) * av_q2d(stream.time_base) +
+              static_cast<double>(stream.duration) * av_q2d(stream.time_base);
+    }
+    if (isUnreadable_ || packetsEnd_ + least < std::min(time, end))
+        endedEarly_ = true;
+}
+
 void PictureReader::advance(double time) {
     for (;;) {
         if (!following_ && !isAtEnd_) {
             following_ = next();
             isAtEnd_ = !following_;
+            if (isAtEnd_)
+                noteEnd(time);
         }
         if (!following_ || (current_ && following_->time > time + s_rounding))
             return;

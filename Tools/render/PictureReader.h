@@ -27,6 +27,12 @@ public:
 
     std::uint64_t pictureNumber() const { return number_; } ///< grows with every other picture that `at` returns
 
+    /// Returns when the picture that `at` returned last begins: after the time if the movie has no earlier picture.
+    double pictureTime() const { return current_ ? current_->time : 0; }
+
+    /// Returns whether a picture after the last one was asked for although the stream should go on, or reading failed.
+    bool endedEarly() const { return endedEarly_; }
+
     int width() const { return width_; }   ///< of its pictures, which stand upright
     int height() const { return height_; } ///< the same
 
@@ -45,6 +51,7 @@ private:
     std::optional<Decoded> next();
     bool send();
     void seek(double time);
+    void noteEnd(double time);
     void advance(double time);
     double secondsOf(const AVFrame& frame) const;
     YuvPicture prepared(const AVFrame& frame);
@@ -60,6 +67,9 @@ private:
     std::optional<Decoded> following_;
     bool isAtEnd_ = false;
     bool isFlushing_ = false;
+    bool isUnreadable_ = false; ///< reading ended by an error
+    bool endedEarly_ = false;
+    double packetsEnd_ = 0; ///< when the last packet ends that was read, in seconds
     double lastTime_ = 0;
     YuvPicture picture_;
     bool isPrepared_ = false;

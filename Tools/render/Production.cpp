@@ -1,7 +1,6 @@
 #include "Tools/render/Production.h"
 
 #include "Tools/render/JsonFields.h"
-#include "Tools/zulm/Command.h"
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/TemporaryFile.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
@@ -51,8 +50,7 @@ Production::~Production() = default;
 
 void Production::redact() {
     const RedactedStreams redacted = redactions_.redacted(recording_);
-    for (const std::string& warning : redacted.warnings)
-        Zulm::warn(fmt::format("{}: {}", recording_.name(), warning));
+    losses_ = redacted.losses;
     redactedFile_ =
         std::make_unique<Zulm::TemporaryFile>(std::filesystem::temp_directory_path().string(), "redacted", ".mp4");
     std::ofstream(redactedFile_->path(), std::ios::binary) << std::string("\0\0\0\x10"
@@ -85,7 +83,7 @@ EditList Production::whole() const {
 }
 
 EditList Production::withoutIdle(double least, double rest) const {
-    const InsightSources sources = insightSourcesOf(shown(), [](const Error&) {});
+    const InsightSources sources = insightSourcesOf(recording_, [](const Error&) {}); // times alone
     std::vector<EditRange> removed;
     const double length = duration();
     for (const IdleSpan& span : idleSpansOf(sources.positions, sources.actions, sources.keys, sources.scrolling, length,
@@ -125,6 +123,20 @@ void Production::prepare(const EditList& edits, const std::string& zoom, int lar
         };
     }
     composer_ = std::make_unique<Composer>(*session_, pictures_, *stage_, style_, cover);
+}
+
+Zulm::ExitCode Production::complain() const {
+    const EditedRecording& edited = session_->edited();
+    for (const std::string& warning : edited.warnings)
+        Zulm::warn(fmt::format("{}: {}", recording_.name(), warning));
+    std::vector<std::string> losses = losses_;
+    losses.insert(losses.end(), edited.losses.begin(), edited.losses.end());
+    if (pictures_.endedEarly())
+        losses.emplace_back(
+            "its pictures end before the movie does, as in a file that was cut off; the last one stays");
+    for (const std::string& loss : losses)
+        Zulm::complain(fmt::format("{}: {}", recording_.name(), loss));
+    return losses.empty() ? Zulm::ExitFine : Zulm::ExitDamaged;
 }
 
 std::string Production::shownRegion(const ByteSource& stored) const {

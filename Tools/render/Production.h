@@ -5,6 +5,7 @@
 #include "Tools/render/Composer.h"
 #include "Tools/render/Options.h"
 #include "Tools/render/Redactions.h"
+#include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"
 #include "ZULMetaDataBridge/Source/StreamSource.h"
 
@@ -55,6 +56,10 @@ public:
     /// while the camera is at rest.
     std::vector<ZULMetaData::StreamSource> streams();
 
+    /// Warns of streams that nobody knows, and complains about what of the recording is not in the film. Call it when
+    /// the film is done. Returns how the command ends.
+    Zulm::ExitCode complain() const;
+
 private:
     FilmSize sizeFor(int largestWidth) const;
     void redact();
@@ -67,7 +72,8 @@ private:
     std::unique_ptr<Zulm::TemporaryFile> redactedFile_;
     std::unique_ptr<ZULMetaData::Recording> redacted_; ///< null if nothing is covered
     Redactions redactions_;
-    std::string region_; ///< the stream of it that the film gets
+    std::vector<std::string> losses_; ///< by covering
+    std::string region_;              ///< the stream of it that the film gets
     PictureReader pictures_;
     std::unique_ptr<Stage> stage_;
     std::unique_ptr<FilmSession> session_;

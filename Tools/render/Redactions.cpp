@@ -51,12 +51,13 @@ class Presence {
 public:
     explicit Presence(const std::vector<CoveredPlace>& places) : places_(places) {}
 
-    /// Returns the times in which the value of a track lies in one of the places. What lies between two values counts
-    /// if one of them does. What is not known counts if `countsUnknown`.
+    /// Returns the times in which the value of a track lies in one of the places. What is not known
+    /// counts if `countsUnknown`. If the values are places of something that `moves`, the time between two values
+    /// counts if one of them lies there.
     template <class Kind>
     std::vector<TimeRange> of(const Track<Kind>& track,
-                              bool (*lies)(const ScreenRect&, const typename Track<Kind>::Value&),
-                              bool countsUnknown) const {
+                              bool (*lies)(const ScreenRect&, const typename Track<Kind>::Value&), bool countsUnknown,
+                              bool moves = false) const {
         std::vector<TimeRange> ranges;
         for (const CoveredPlace& place : places_) {
             const auto add = [&](double from, double to) {
@@ -69,11 +70,9 @@ public:
             for (std::size_t i = 0; i < track.size(); ++i) {
                 const double end = i + 1 < track.size() ? times[i + 1] : place.to;
                 const bool isThere = lies(place.area, track.values()[i]);
-                const bool goesThere = i + 1 < track.size() && lies(place.area, track.values()[i + 1]);
-                if (isThere)
+                const bool goesThere = moves && i + 1 < track.size() && lies(place.area, track.values()[i + 1]);
+                if (isThere || goesThere)
                     add(std::max(place.from, times[i]), std::min(place.to, end));
-                else if (goesThere && end >= place.from && end <= place.to)
-                    add(end, end);
             }
         }
         return ranges;
@@ -95,7 +94,7 @@ class Removal {
 public:
     Removal(const Recording& recording, const std::vector<CoveredPlace>& places) : always_(Presence(places).always()) {
         const Presence presence(places);
-        cursor_ = presence.of<CursorLocationKind>(recording.track<CursorLocationKind>(), touchesPoint, true);
+        cursor_ = presence.of<CursorLocationKind>(recording.track<CursorLocationKind>(), touchesPoint, true, true);
         const auto& windows = recording.track<TopmostWindowKind>();
         window_ = presence.of<TopmostWindowKind>(windows, touchesRect, true);
         title_ = presence.of<TopmostWindowKind>(windows, touchesTitle, true);
@@ -106,7 +105,7 @@ public:
         const auto isOneOf = [&kind](std::initializer_list<uuid> kinds) {
             return std::find(kinds.begin(), kinds.end(), kind) != kinds.end();
         };
-        if (isOneOf({CursorLocationKind::type, CursorActionKind::type, ScrollActionKind::type}))
+        if (isOneOf({CursorLocationKind::type, CursorActionKind::type, ScrollActionKind::type, CursorImageKind::type}))
             return cursor_;
         if (isOneOf({KeyboardActionKind::type}))
             return window_;
@@ -114,8 +113,8 @@ public:
             return title_;
         if (isOneOf({HoverRectKind::type}))
             return hover_;
-        if (isOneOf({CursorImageKind::type, CursorOpacityKind::type, CPUUsageKind::type, TopmostWindowKind::type,
-                     RecordingRegionKind::type, ScaleFactorKind::type, SystemDataKind::type}))
+        if (isOneOf({CursorOpacityKind::type, CPUUsageKind::type, TopmostWindowKind::type, RecordingRegionKind::type,
+                     ScaleFactorKind::type, SystemDataKind::type}))
             return {};
         return always_; // texts of slides, and what nobody knows
     }
@@ -204,9 +203,12 @@ RedactedStreams Redactions::redacted(const Recording& recording) const {
         if (redacted.removal == RedactedStream::Kept)
             result.streams.push_back(bytes.str());
         else
-            result.warnings.push_back(fmt::format("its stream {} cannot be decoded, so that nobody can tell what in it "
-                                                  "is covered; it was left out",
-                                                  stream.name()));
+            result.losses.push_back(fmt::format("its stream {} cannot be decoded, so that nobody can tell what in it "
+                                                "is covered; it was left out",
+                                                stream.name()));
+        if (redacted.bytesLeftOut > 0)
+            result.losses.push_back(fmt::format("its stream {} lost {} bytes after its last whole entry", stream.name(),
+                                                redacted.bytesLeftOut));
     }
     return result;
 }

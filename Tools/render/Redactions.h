@@ -19,8 +19,8 @@ struct CoveredPlace {
 
 /// The streams of a recording without what lies in the places.
 struct RedactedStreams {
-    std::vector<std::string> streams;  ///< their bytes, headers included
-    std::vector<std::string> warnings; ///< sentences about streams that were left out
+    std::vector<std::string> streams; ///< their bytes, headers included
+    std::vector<std::string> losses;  ///< sentences about streams that were left out, or parts of them
 };
 
 class Redactions {
@@ -35,17 +35,17 @@ public:
     bool empty() const { return places_.empty(); }
 
     /// Fills what is covered at a time of the recording with black. The picture shows `region`. Returns false if
-    /// nothing is covered, and leaves the picture as it is. Else the picture gets bytes of its own.
+    /// nothing is covered, and leaves the picture as it is. A picture that is covered gets bytes of its own.
     bool cover(YuvPicture& picture, double time, const ZULMetaData::ScreenRect& region) const;
 
-    /// Returns whether a cursor at this point would touch what is covered at a time. Where it is then is not known: it
-    /// must not be drawn on its way between two positions that are.
+    /// Returns whether a cursor at this point would touch what is covered at a time. Its positions there are removed,
+    /// so that it must not be drawn on its way between the positions before and after them.
     bool hidesCursor(const ZULMetaData::ScreenPoint& position, double time) const;
 
-    /// Returns the streams without what lies in the places at their times: positions, clicks and scrolling of a cursor
-    /// that is there; keys while the window on top touches a place or is not known; the title and application of a
-    /// window whose upper edge is there; rectangles of windows and controls; all texts of slides. Streams that cannot
-    /// be decoded are left out.
+    /// Returns the streams without what lies in the places at their times: positions, images, clicks and scrolling of a
+    /// cursor that is there; keys while the window on top touches a place or is not known; the title and application of
+    /// a window whose upper edge is there; rectangles of controls; all texts of slides. Rectangles of windows stay.
+    /// Streams that cannot be decoded are left out.
     RedactedStreams redacted(const ZULMetaData::Recording& recording) const;
 
 private:

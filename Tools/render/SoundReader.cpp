@@ -1,6 +1,7 @@
 #include "Tools/render/SoundReader.h"
 
 #include "Tools/zulm/Failure.h"
+#include "Tools/zulm/SoundTempo.h"
 
 #include <fmt/core.h>
 
@@ -10,7 +11,6 @@ extern "C" {
 }
 
 #include <algorithm>
-#include <array>
 #include <cmath>
 
 namespace Render {
@@ -19,11 +19,13 @@ using Zulm::Failure;
 
 namespace {
 
-/// Returns the rate of the film: that of the movie if encoders take it.
-int rateFor(int rate) {
-    constexpr std::array rates{8000, 11025, 12000, 16000, 22050, 24000, 32000, 44100, 48000};
-    constexpr int usual = 48000;
-    return std::find(rates.begin(), rates.end(), rate) == rates.end() ? usual : rate;
+constexpr double s_latest = 1e7;       ///< seconds; a later time in a movie is damage
+constexpr double s_longestFilling = 1; ///< seconds of a pause that are held as samples
+
+/// Returns whether one converter takes both frames.
+bool areAlike(const AVFrame& left, const AVFrame& right) {
+    return left.format == right.format && left.sample_rate == right.sample_rate &&
+           av_channel_layout_compare(&left.ch_layout, &right.ch_layout) == 0;
 }
 
 } // namespace
@@ -36,7 +38,7 @@ SoundReader::SoundReader(const std::string& path, const std::string& name)
         if (static_cast<int>(i) != stream_)
             movie_.input->streams[i]->discard = AVDISCARD_ALL;
     decoder_ = movie_.decoderOf(stream_);
-    rate_ = rateFor(decoder_->sample_rate);
+    rate_ = Zulm::soundRateFor(decoder_->sample_rate);
 }
 
 SoundReader::~SoundReader() = default;
@@ -55,12 +57,13 @@ void SoundReader::seek(std::int64_t sample) {
     avcodec_flush_buffers(decoder_.get());
     converter_.reset();
     buffer_.clear();
+    seekPlace_ = std::max<std::int64_t>(0, std::llround(time * rate_));
     isPlaced_ = false;
     isAtEnd_ = false;
 }
 
 void SoundReader::convert(const AVFrame* frame) {
-    const int room = frame ? swr_get_out_samples(converter_.get(), frame->nb_samples) : 1024;
+    const int room = swr_get_out_samples(converter_.get(), frame ? frame->nb_samples : 0);
     const std::size_t before = buffer_.size();
     buffer_.resize(before + static_cast<std::size_t>(std::max(0, room)) * s_soundChannels);
     void* samples = buffer_.data() + before;
@@ -71,38 +74,57 @@ void SoundReader::convert(const AVFrame* frame) {
     buffer_.resize(before + static_cast<std::size_t>(std::max(0, made)) * s_soundChannels);
 }
 
+void SoundReader::prepareConverter(const AVFrame& frame) {
+    if (converter_ && areAlike(*converted_, frame))
+        return;
+    if (converter_)
+        convert(nullptr); // a movie may change its format at any frame
+    converted_.reset(av_frame_clone(&frame));
+    if (!converted_)
+        throw std::bad_alloc();
+    AVChannelLayout stereo;
+    av_channel_layout_default(&stereo, static_cast<int>(s_soundChannels));
+    SwrContext* made = nullptr;
+    swr_alloc_set_opts2(&made, &stereo, AV_SAMPLE_FMT_FLT, rate_, &converted_->ch_layout,
+                        static_cast<AVSampleFormat>(frame.format), frame.sample_rate, 0, nullptr);
+    converter_.reset(made);
+    if (!made || swr_init(made) < 0)
+        throw Failure(fmt::format("{}: its sound is of a format that cannot be converted; --no-sound leaves it out",
+                                  movie_.name));
+}
+
+void SoundReader::place(const AVFrame& frame) {
+    const std::int64_t stamp = frame.best_effort_timestamp != AV_NOPTS_VALUE ? frame.best_effort_timestamp : frame.pts;
+    const double time = static_cast<double>(stamp) * av_q2d(movie_.input->streams[stream_]->time_base);
+    const bool hasTime = stamp != AV_NOPTS_VALUE && std::abs(time) <= s_latest;
+    if (!hasTime && isPlaced_)
+        return;
+    const double delay = static_cast<double>(swr_get_delay(converter_.get(), rate_));
+    const std::int64_t place = hasTime ? std::llround(time * rate_ - delay) : seekPlace_;
+    const std::int64_t off = place - bufferedEnd();
+    const std::int64_t rounding = rate_ / 500; // movies round times by less
+    if (!isPlaced_) {
+        bufferStart_ = place;
+        knownFrom_ = place;
+        isPlaced_ = true;
+    } else if (static_cast<double>(off) > s_longestFilling * rate_) {
+        buffer_.clear(); // what was asked for has been copied
+        bufferStart_ = place;
+    } else if (off > rounding) {
+        buffer_.resize(buffer_.size() + static_cast<std::size_t>(off) * s_soundChannels);
+    } else if (off < -rounding) {
+        const auto known = static_cast<std::int64_t>(buffer_.size() / s_soundChannels);
+        buffer_.resize(static_cast<std::size_t>(std::max<std::int64_t>(0, known + off)) * s_soundChannels);
+        bufferStart_ = std::min(bufferStart_, place);
+        knownFrom_ = std::min(knownFrom_, bufferStart_);
+    }
+}
+
 void SoundReader::take(const AVFrame& frame) {
     if (frame.sample_rate <= 0 || frame.nb_samples <= 0)
         return;
-    if (!converter_) {
-        AVChannelLayout stereo;
-        AVChannelLayout source = frame.ch_layout; // which is only read
-        av_channel_layout_default(&stereo, static_cast<int>(s_soundChannels));
-        SwrContext* made = nullptr;
-        swr_alloc_set_opts2(&made, &stereo, AV_SAMPLE_FMT_FLT, rate_, &source,
-                            static_cast<AVSampleFormat>(frame.format), frame.sample_rate, 0, nullptr);
-        converter_.reset(made);
-        if (!made || swr_init(made) < 0)
-            throw Failure(fmt::format("{}: its sound is of a format that cannot be converted", movie_.name));
-    }
-    const std::int64_t stamp = frame.best_effort_timestamp != AV_NOPTS_VALUE ? frame.best_effort_timestamp : frame.pts;
-    if (stamp != AV_NOPTS_VALUE) {
-        const double time = static_cast<double>(stamp) * av_q2d(movie_.input->streams[stream_]->time_base);
-        const double delay = static_cast<double>(swr_get_delay(converter_.get(), rate_));
-        const auto place = static_cast<std::int64_t>(std::llround(time * rate_ - delay));
-        const std::int64_t off = place - bufferedEnd();
-        const std::int64_t rounding = rate_ / 500; // movies round times by less
-        if (!isPlaced_) {
-            bufferStart_ = place;
-            isPlaced_ = true;
-        } else if (off > rounding && off < rate_ * 3600LL) {
-            buffer_.resize(buffer_.size() + static_cast<std::size_t>(off) * s_soundChannels); // a pause in the movie
-        } else if (off < -rounding) {
-            const auto known = static_cast<std::int64_t>(buffer_.size() / s_soundChannels);
-            buffer_.resize(static_cast<std::size_t>(std::max<std::int64_t>(0, known + off)) * s_soundChannels);
-            bufferStart_ = std::min(bufferStart_, place);
-        }
-    }
+    prepareConverter(frame);
+    place(frame);
     convert(&frame);
 }
 
@@ -115,8 +137,13 @@ bool SoundReader::decode() {
             take(*frame);
             return true;
         }
-        if (error == AVERROR_EOF || isAtEnd_)
-            return false;
+        if (error == AVERROR_EOF || isAtEnd_) {
+            if (!converter_)
+                return false;
+            convert(nullptr); // the last samples
+            converter_.reset();
+            return true;
+        }
         for (;;) {
             if (av_read_frame(movie_.input.get(), packet.get()) < 0) {
                 isAtEnd_ = true;
@@ -139,15 +166,22 @@ void SoundReader::read(std::int64_t first, std::span<float> samples) {
         return;
     const std::int64_t end = first + static_cast<std::int64_t>(samples.size() / s_soundChannels);
     const std::int64_t farAhead = rate_ * 5LL;
-    if (!isPlaced_ || first < bufferStart_ || first > bufferedEnd() + farAhead)
+    if (!isPlaced_ || first < knownFrom_ || first > bufferedEnd() + farAhead)
         seek(first);
+    copyTo(first, samples);
     while ((!isPlaced_ || bufferedEnd() < end) && decode()) {
+        copyTo(first, samples);
         const std::int64_t past = std::min(bufferedEnd(), first) - bufferStart_;
         if (isPlaced_ && past > 0) { // nobody asks for it any more, but a little may be asked for again
             buffer_.erase(buffer_.begin(), buffer_.begin() + static_cast<std::ptrdiff_t>(past * 2));
             bufferStart_ += past;
+            knownFrom_ = bufferStart_;
         }
     }
+}
+
+void SoundReader::copyTo(std::int64_t first, std::span<float> samples) const {
+    const std::int64_t end = first + static_cast<std::int64_t>(samples.size() / s_soundChannels);
     const std::int64_t from = std::max(first, bufferStart_);
     const std::int64_t to = std::min(end, bufferedEnd());
     if (isPlaced_ && from < to)

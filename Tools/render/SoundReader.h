@@ -35,7 +35,10 @@ private:
     void seek(std::int64_t sample);
     bool decode();
     void take(const AVFrame& frame);
-    void convert(const AVFrame* frame);
+    void prepareConverter(const AVFrame& frame);
+    void place(const AVFrame& frame);
+    void convert(const AVFrame* frame); ///< null takes what the converter still holds
+    void copyTo(std::int64_t first, std::span<float> samples) const;
     std::int64_t bufferedEnd() const;
 
     OpenMovie movie_;
@@ -43,8 +46,11 @@ private:
     int rate_ = 0;
     CodecPointer decoder_;
     std::unique_ptr<SwrContext, Releaser<swr_free>> converter_;
+    FramePointer converted_; ///< a frame of the format that the converter takes
     std::vector<float> buffer_;
     std::int64_t bufferStart_ = 0; ///< the number of the first sample in the buffer
+    std::int64_t knownFrom_ = 0;   ///< what is between this sample and the buffer is silent
+    std::int64_t seekPlace_ = 0;   ///< the sample to which the last seek went
     bool isPlaced_ = false;        ///< whether that is known
     bool isAtEnd_ = false;
 };

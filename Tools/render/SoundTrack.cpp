@@ -1,6 +1,7 @@
 #include "Tools/render/SoundTrack.h"
 
 #include "Tools/zulm/Failure.h"
+#include "Tools/zulm/SoundTempo.h"
 
 #include <fmt/core.h>
 
@@ -25,19 +26,6 @@ namespace {
 /// together best. Its sound begins so many seconds later.
 constexpr double s_earliness = 0.016;
 
-/// One filter changes the tempo by a limited factor.
-std::string tempoFilters(double speed) {
-    constexpr double most = 100;
-    constexpr double least = 0.5;
-    std::string filters;
-    do {
-        const double factor = std::clamp(speed, least, most);
-        filters += fmt::format("{}atempo={:.17g}", filters.empty() ? "" : ",", factor);
-        speed /= factor;
-    } while (speed > most || speed < least || std::abs(speed - 1) > 1e-9);
-    return filters;
-}
-
 } // namespace
 
 Tempo::Tempo(double speed, int rate) : graph_(avfilter_graph_alloc()), rate_(rate) {
@@ -54,14 +42,14 @@ Tempo::Tempo(double speed, int rate) : graph_(avfilter_graph_alloc()), rate_(rat
         *outputs = {av_strdup("in"), source_, 0, nullptr};
         *inputs = {av_strdup("out"), sink_, 0, nullptr};
     }
-    const std::string filters = tempoFilters(speed) + ",aformat=sample_fmts=flt:channel_layouts=stereo";
+    const std::string filters = Zulm::tempoFilters(speed) + ",aformat=sample_fmts=flt:channel_layouts=stereo";
     const bool isReady = isMade &&
                          avfilter_graph_parse_ptr(graph_.get(), filters.c_str(), &inputs, &outputs, nullptr) >= 0 &&
                          avfilter_graph_config(graph_.get(), nullptr) >= 0;
     avfilter_inout_free(&inputs);
     avfilter_inout_free(&outputs);
     if (!isReady)
-        throw Failure(fmt::format("the sound cannot be played {} times as fast", speed));
+        throw Failure(fmt::format("the sound cannot be played {} times as fast; --no-sound leaves it out", speed));
 }
 
 void Tempo::add(std::span<const float> samples) {
@@ -84,7 +72,8 @@ void Tempo::end() {
 
 void Tempo::feed(AVFrame* frame) {
     if (const int error = av_buffersrc_add_frame(source_, frame); error < 0)
-        throw Failure("the tempo of the sound cannot be changed: " + textOf(error));
+        throw Failure(
+            fmt::format("the tempo of the sound cannot be changed: {}; --no-sound leaves it out", textOf(error)));
 }
 
 bool Tempo::take(std::vector<float>& samples) {
@@ -132,7 +121,7 @@ std::vector<float> SoundTrack::readUntil(double film) {
 
 void SoundTrack::readPiece(std::span<float> samples) {
     const EditPiece& piece = edits_.pieces()[piece_];
-    if (piece.isHeld() || samples.empty())
+    if (piece.isHeld() || samples.empty() || !Zulm::isHeardAt(piece.speed.nearest()))
         return;
     if (piece.speed == Rational(1))
         reader_.read(std::llround(piece.start.nearest() * rate()) + written_ - begin_, samples);

@@ -2,7 +2,11 @@
 
 #include "Tools/render/Canvas.h"
 #include "Tools/zulm/Failure.h"
+#include "Tools/zulm/FileAccess.h"
 #include "Tools/zulm/OutputFile.h"
+
+#include <filesystem>
+#include <system_error>
 
 namespace Render {
 
@@ -21,6 +25,21 @@ void writePng(const YuvPicture& picture, const std::string& path, const std::str
     if (cairo_surface_write_to_png_stream(surface.get(), append, &file) != CAIRO_STATUS_SUCCESS)
         throw Zulm::Failure(path + ": the picture cannot be encoded");
     Zulm::writeWholeFile(path, file, {recording}, force);
+}
+
+WrittenFiles::WrittenFiles(const std::string& folder)
+    : folder_(folder), isNewFolder_(!std::filesystem::exists(folder)) {
+    Zulm::createFolder(folder);
+}
+
+WrittenFiles::~WrittenFiles() {
+    if (isKept_)
+        return;
+    std::error_code ignored;
+    for (const std::string& path : paths_)
+        std::filesystem::remove(path, ignored);
+    if (isNewFolder_)
+        std::filesystem::remove(folder_, ignored); // does nothing if somebody put a file into it
 }
 
 } // namespace Render

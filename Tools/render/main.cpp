@@ -1,6 +1,9 @@
 #include "Tools/render/Film.h"
 #include "Tools/render/Guide.h"
+#include "Tools/zulm/Command.h"
 #include "Tools/zulm/Interruptions.h"
+#include "Tools/zulm/OutOfMemory.h"
+#include "Tools/zulm/StandardStreams.h"
 #include "ZULMetaDataSession/Error.h"
 
 extern "C" {
@@ -13,6 +16,7 @@ extern "C" {
 #include <algorithm>
 #include <exception>
 #include <string>
+#include <system_error>
 #include <vector>
 
 namespace {
@@ -33,20 +37,42 @@ Zulm::ExitCode run(const std::string& command, const std::vector<std::string>& w
     return Zulm::ExitUsage;
 }
 
+/// The same, but what goes wrong is told as `zulm` tells it.
+Zulm::ExitCode runOrComplain(const std::string& command, const std::vector<std::string>& words) {
+    std::exception_ptr usage;
+    const Zulm::ExitCode code = Zulm::orComplaint([&] {
+        try {
+            return run(command, words);
+        } catch (const CLI::ParseError&) {
+            usage = std::current_exception();
+            return Zulm::ExitUsage;
+        }
+    });
+    if (usage)
+        std::rethrow_exception(usage);
+    return code;
+}
+
 } // namespace
 
 int main(int argc, char** argv) {
+    Zulm::endWhereMemoryRunsOut();
+    Zulm::secureStandardStreams();
     av_log_set_level(AV_LOG_FATAL);
     const std::string command = argc > 1 ? argv[1] : "";
     try {
-        return run(command, {argv + std::min(argc, 2), argv + argc});
+        const Zulm::ExitCode code = runOrComplain(command, {argv + std::min(argc, 2), argv + argc});
+        return Zulm::flushStandardOutput() ? code : Zulm::ExitFailed;
     } catch (const CLI::ParseError& error) {
         Zulm::complain(error.what());
         Zulm::complain(fmt::format("'zulm {} --help' shows what can be given", command));
         return Zulm::ExitUsage;
     } catch (const Zulm::Interruption& interruption) {
-        Zulm::complain("interrupted; nothing was written");
+        Zulm::complain("interrupted; no part of the result is left");
         Zulm::endBy(interruption);
+    } catch (const std::system_error& error) { // only standard output throws this
+        Zulm::complainAboutOutput(error.code().value());
+        return Zulm::ExitFailed;
     } catch (const std::exception& error) {
         Zulm::complain(error.what());
         return Zulm::ExitFailed;

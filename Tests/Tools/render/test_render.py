@@ -274,6 +274,35 @@ class Styles(Films):
         self.assertEqual(region, (0, -20, -11, 200, 113))
 
 
+class Captions(Films):
+    """Two recordings that differ in one key alone show whether a film tells which key it was."""
+    CONTROL, ALT, VIRTUAL = 0x40000, 0x80000, 0x40000000
+
+    def picture(self, code, flags, display):
+        encode(self.movie, 320, 180, 30, [bytes([60]) * (320 * 180)] * 60)
+        attach(self.movie, {"recordingRegion": [(0, 0, 0, 320, 180)], "cursorLocation": [(0, 5, 5)],
+                            "keyboardAction": [(0.5, code, flags)]})
+        stills = self.folder / "stills"
+        run(self.movie, "--frames", stills, "--at", "1", "--keys", display, "--force", "--style", self.style())
+        return ffmpeg("-i", stills / "frame-00001.000.png", "-f", "rawvideo", "-pix_fmt", "gray", "-")
+
+    def tells(self, flags, display):
+        return self.picture(ord("S"), flags, display) != self.picture(ord("Q"), flags, display)
+
+    def test_a_shortcut_shows_its_character(self):
+        for display in ("shown", "shortcuts"):
+            self.assertTrue(self.tells(self.VIRTUAL | self.CONTROL, display), display)
+        self.assertFalse(self.tells(self.VIRTUAL | self.CONTROL, "hidden"))
+
+    def test_what_is_typed_shows_only_if_asked(self):
+        self.assertTrue(self.tells(self.VIRTUAL, "shown"))
+        self.assertEqual(self.picture(ord("S"), self.VIRTUAL, "shortcuts"), self.picture(ord("S"), self.VIRTUAL, "hidden"))
+
+    def test_a_character_that_alt_types_shows_only_if_asked(self):
+        self.assertTrue(self.tells(self.ALT, "shown"))
+        self.assertFalse(self.tells(self.ALT, "shortcuts"))
+
+
 class Outputs(Films):
     def setUp(self):
         super().setUp()
@@ -324,6 +353,17 @@ class Outputs(Films):
             process.wait(60)
         self.assertEqual(process.returncode, -signal.SIGINT)
         self.assertEqual(sorted(path.name for path in self.folder.iterdir()), ["Long.mp4", "Recording.mp4"])
+
+    def test_two_times_of_one_name_are_refused(self):
+        stills = self.folder / "stills"
+        self.assertEqual(run(self.movie, "--frames", stills, "--at", "1,1.0001", check=False).returncode, 1)
+        self.assertFalse(stills.exists())
+
+    def test_a_full_standard_output_is_a_failure(self):
+        with open("/dev/full", "wb") as full:
+            done = subprocess.run([RENDERER, "render", str(self.movie), "-o", str(self.film)], stdout=full,
+                                  stderr=subprocess.PIPE, timeout=300)
+        self.assertEqual(done.returncode, 1, done.stderr)
 
     def test_wrong_options_are_refused(self):
         for words in ([], ["-o", "x.avi"], ["--gif", "-o", "x.mp4"], ["-o", "x.mp4", "--size", "3x3"],
@@ -476,11 +516,12 @@ class Guide(Films):
             "recordingRegion": [(0, 0, 0, 320, 240)],
             "cursorLocation": [(0, 100, 100), (4, 200, 50)],
             "cursorAction": [(1, 1), (1.1, 2), (1.2, 1), (1.3, 2), (5, 4), (5.1, 8)],
-            "keyboardAction": [(3, 112, 0), (3.1, 113, 0)],
+            "keyboardAction": [(3, 112, 0), (3.1, 113, 0), (6.5, ord("S"), 0x40040000)],
             "topmostAppName": [(0, "Editor")], "topmostWindowTitle": [(0, "<b> & *stars*"), (4, "Second")]})
         run(self.movie, "-o", self.folder / "guide", command="guide")
         names = sorted(path.name for path in (self.folder / "guide").iterdir())
-        self.assertEqual(names, ["guide.html", "guide.md", "step-001.png", "step-002.png", "step-003.png"])
+        self.assertEqual(names, ["guide.html", "guide.md", "step-001.png", "step-002.png", "step-003.png",
+                                 "step-004.png"])
         page = (self.folder / "guide" / "guide.html").read_text()
         self.assertEqual(re.findall(r"<li>([^<]*)", page)[0].strip(), "Double-click")
         self.assertIn("&lt;b&gt; &amp; *stars* (Editor)", page)
@@ -488,6 +529,7 @@ class Guide(Films):
         text = (self.folder / "guide" / "guide.md").read_text()
         self.assertIn("2. Type the text", text)
         self.assertIn("3. Right-click — Second \\(Editor\\)", text)
+        self.assertIn("4. Press ⌃S", text)
 
 
 if __name__ == "__main__":
