@@ -83,9 +83,8 @@ void JsonWriter::element(const Json& value) {
 
 JsonWriter JsonWriter::forElements(TextSink sink) const {
     JsonWriter writer(std::move(sink), style_);
-    writer.open_ = open_;
-    if (!writer.open_.empty())
-        writer.open_.back().isEmpty = true;
+    for (const Open& level : open_) // whether one is empty may change meanwhile, in another thread
+        writer.open_.push_back({level.closing});
     return writer;
 }
 

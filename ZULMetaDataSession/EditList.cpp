@@ -94,6 +94,8 @@ EditRange parseEditRange(std::string_view text) {
 void EditList::keep(const Rational& start, const Rational& end, const Rational& speed) {
     requireOrder({start, end});
     requirePositive("speed", speed);
+    if (speed.nearest() == 0)
+        refuse("speed is nearer to 0 than any 64-bit floating-point number");
     add({start, end, speed, (end - start) / speed});
 }
 

@@ -21,11 +21,11 @@ auto orError(const std::string& name, Work work) {
     } catch (const SaveError& error) {
         throw Error(error.file(), error.sentence());
     } catch (const FileError& error) {
-        throw Error(error.file(), error.sentence());
+        throw Error(error.file(), error.sentence(), error.code());
     } catch (const std::filesystem::filesystem_error& error) { // whose text repeats the names of files
-        throw Error(name, error.code().message());
+        throw Error(name, error.code().message(), error.code());
     } catch (const std::system_error& error) {
-        throw Error(name, error.what());
+        throw Error(name, error.what(), error.code());
     }
 }
 

@@ -93,6 +93,8 @@ TEST(EditList, RefusesTimesThatNoEntryCanHave) {
     EXPECT_EQ(errorOf([&] { edits.keep(0, 1, large * 2); }), "speed" + tooLarge);
     EXPECT_EQ(errorOf([&] { edits.hold(large * 2, 1); }), "at" + tooLarge);
     EXPECT_EQ(errorOf([&] { edits.hold(0, large * 2); }), "duration" + tooLarge);
+    EXPECT_EQ(errorOf([&] { edits.keep(0, 1, Rational(1) / large / large); }),
+              "speed is nearer to 0 than any 64-bit floating-point number");
     edits.keep(0, large);
     const std::string tooLong =
         "the edited movie would last more seconds than the largest 64-bit floating-point number";

@@ -1,17 +1,21 @@
 #include "Tools/record/RecordingFolder.h"
 
 #include "Tools/record/Failure.h"
+#include "ZULMetaDataBridge/Source/MetaDataKinds.h"
 
 #include <fmt/core.h>
 
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/statvfs.h>
+#include <unistd.h>
 
 #include <cerrno>
 #include <cstdio>
 #include <cstring>
+#include <string>
 #include <system_error>
+#include <utility>
 
 namespace Recorder {
 
@@ -93,8 +97,26 @@ void RecordingFolder::publish() {
 
 void RecordingFolder::remove() {
     releaseReserve();
-    std::error_code ignored; // what is left says so by being there
-    fs::remove_all(folder_, ignored);
+    removeRecording(folder_); // what is left says so by being there
+}
+
+std::vector<fs::path> streamFilesIn(const fs::path& folder) {
+    std::vector<fs::path> files;
+    ZULMetaData::RecordedKinds::forEach([&]<class Kind>() {
+        fs::path file = folder / (ZULMetaData::metaDataKindName(Kind::type) + ".dat");
+        std::error_code error;
+        if (fs::is_regular_file(fs::symlink_status(file, error)))
+            files.push_back(std::move(file));
+    });
+    return files;
+}
+
+bool removeRecording(const fs::path& folder) {
+    for (const char* name : {"reserve", "movie.mp4", "session.lock"})
+        unlink((folder / name).c_str());
+    for (const fs::path& file : streamFilesIn(folder)) // last, since they show whose folder it is
+        unlink(file.c_str());
+    return rmdir(folder.c_str()) == 0;
 }
 
 void renameWithoutReplacing(const fs::path& from, const fs::path& to) {

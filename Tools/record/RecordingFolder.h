@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <filesystem>
 #include <mutex>
+#include <vector>
 
 namespace Recorder {
 
@@ -36,7 +37,7 @@ public:
     /// Makes the movie OUT. Never replaces a file: throws `Failure` if OUT has appeared meanwhile.
     void publish();
 
-    /// Removes the folder and all that is in it.
+    /// Does what `removeRecording` does.
     void remove();
 
 private:
@@ -46,6 +47,13 @@ private:
     FileHandle reserve_;
     std::uint64_t reserved_ = 0;
 };
+
+/// Returns the files of a recording's folder that hold streams.
+std::vector<std::filesystem::path> streamFilesIn(const std::filesystem::path& folder);
+
+/// Removes the files that a recorder makes in its folder, and the folder if it holds nothing else. Returns whether the
+/// folder is removed.
+bool removeRecording(const std::filesystem::path& folder);
 
 /// Renames a file unless there is one of the new name. Throws `Failure`.
 void renameWithoutReplacing(const std::filesystem::path& from, const std::filesystem::path& to);

@@ -4,7 +4,10 @@
 #include "Tools/record/FileHandle.h"
 #include "Tools/record/FragmentedMovie.h"
 #include "Tools/record/RecordingFolder.h"
+#include "ZULMetaData/ByteSource.h"
+#include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
+#include "ZULMetaDataBridge/Source/RecordingFile.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 #include "ZULMetaDataSession/Recording.h"
 
@@ -21,6 +24,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <system_error>
 #include <type_traits>
 #include <vector>
 
@@ -83,8 +87,9 @@ void copyWhole(int from, int to, std::uint64_t bytes, const std::string& name) {
 /// What of a recording was found.
 struct Findings {
     std::vector<StreamSource> streams;
-    double lastTime = 0;  ///< of all entries
-    double lastUsage = 0; ///< of the stream that has an entry each second
+    std::vector<fs::path> files; ///< of the streams
+    double lastTime = 0;         ///< of all entries
+    double lastUsage = 0;        ///< of the stream that has an entry each second
     bool hasLoss = false;
 
     void lose(const std::string& what) {
@@ -116,6 +121,7 @@ Findings streamsIn(const fs::path& folder) {
             const Track<Kind>& track = stream.track<Kind>();
             if (!track.empty()) {
                 findings.streams.push_back(StreamSource::file(file));
+                findings.files.push_back(file);
                 findings.lastTime = std::max(findings.lastTime, track.times().back());
                 if (std::is_same_v<Kind, CPUUsageKind>)
                     findings.lastUsage = track.times().back();
@@ -129,18 +135,23 @@ Findings streamsIn(const fs::path& folder) {
     return findings;
 }
 
-bool haveSameBytes(const fs::path& left, const fs::path& right) {
-    const FileHandle first(open(left.c_str(), O_RDONLY | O_CLOEXEC));
-    const FileHandle second(open(right.c_str(), O_RDONLY | O_CLOEXEC));
+bool haveSameBytes(const ByteSource& left, const ByteSource& right) {
     std::vector<char> here(std::size_t{1} << 20);
     std::vector<char> there(here.size());
-    for (;;) {
-        const ssize_t count = read(first.get(), here.data(), here.size());
-        if (count < 0 || read(second.get(), there.data(), there.size()) != count ||
-            !std::equal(here.begin(), here.begin() + count, there.begin()))
+    for (std::uint64_t done = 0; done < left.size(); done += here.size()) {
+        const std::size_t count = left.read(done, here);
+        if (right.read(done, there) != count ||
+            !std::equal(here.begin(), here.begin() + static_cast<long>(count), there.begin()))
             return false;
-        if (count == 0)
-            return true;
+    }
+    return left.size() == right.size();
+}
+
+bool haveSameBytes(const fs::path& left, const fs::path& right) {
+    try {
+        return haveSameBytes(ByteSource::file(left.string()), ByteSource::file(right.string()));
+    } catch (const std::system_error&) {
+        return false;
     }
 }
 
@@ -166,20 +177,61 @@ private:
     FileHandle file_;
 };
 
-/// The recorder may have been killed after its movie was whole.
-bool wasSaved(const fs::path& folder, const fs::path& output) {
-    std::error_code error;
-    return !fs::exists(folder / "movie.mp4", error) && fs::exists(output, error);
+/// Returns the header and the whole entries of a stream, or nothing if it has no whole entry.
+std::optional<ByteSource> wholeEntriesOf(const fs::path& file) {
+    const ByteSource stream = ByteSource::file(file.string());
+    const auto extent = measureStream(stream);
+    return extent && extent->entries > 0 ? std::optional(stream.part(0, extent->wholeBytes)) : std::nullopt;
 }
 
-/// Returns whether everything in the recovered movie can be read.
-bool isReadable(const fs::path& movie, std::size_t streams) {
+bool holds(const Recording& movie, const ByteSource& stream) {
+    const std::vector<StreamInfo>& streams = movie.streams();
+    return std::any_of(streams.begin(), streams.end(),
+                       [&](const StreamInfo& info) { return haveSameBytes(movie.bytesOf(info), stream); });
+}
+
+/// Returns whether readers find in a movie the entries of all these stream files, and each file has one.
+bool holdsAll(const fs::path& file, const std::vector<fs::path>& streamFiles) {
     try {
-        return Recording(movie).streams().size() >= streams;
+        const Recording movie(file);
+        return std::all_of(streamFiles.begin(), streamFiles.end(), [&movie](const fs::path& stream) {
+            const auto entries = wholeEntriesOf(stream);
+            return entries && holds(movie, *entries);
+        });
     } catch (const std::exception& problem) {
         say(problem.what());
         return false;
     }
+}
+
+/// The recorder may have been killed after its movie was whole. Throws `Failure` if it was not.
+void requireSaved(const fs::path& folder, const fs::path& output) {
+    std::vector<fs::path> streams = streamFilesIn(folder);
+    std::erase_if(streams, [](const fs::path& stream) { return !wholeEntriesOf(stream); });
+    if (streams.empty())
+        throw Failure(
+            fmt::format("{}: holds no recording, and nothing was changed; name a folder that a recorder left, "
+                        "such as Talk.mp4.recording",
+                        folder.string()));
+    if (!holdsAll(output, streams))
+        throw Failure(
+            fmt::format("{}: is missing, and {} does not hold the streams in the folder; nothing was changed, "
+                        "and 'zulm attach' puts the streams into a movie",
+                        (folder / "movie.mp4").string(), output.string()));
+}
+
+void removeRecovered(const fs::path& folder) {
+    if (!removeRecording(folder))
+        say(fmt::format("{}: was kept, because it holds more than the recording did; look at what is left in it",
+                        folder.string()));
+}
+
+/// Throws `Refusal` if the movie to make would be among the files that it is made from.
+void requireOutside(const fs::path& folder, const fs::path& output) {
+    std::error_code error;
+    if (fs::equivalent(fs::weakly_canonical(fs::absolute(output, error), error).parent_path(), folder, error))
+        throw Refusal(
+            fmt::format("{}: is in the folder of the recording; name another place with -o", output.string()));
 }
 
 } // namespace
@@ -195,12 +247,14 @@ int recover(const fs::path& givenFolder, const fs::path& givenOutput, bool delet
         throw Failure(fmt::format("{}: no such folder", folder.string()));
     }
     requireDead(folder);
-    if (wasSaved(folder, output)) {
+    requireOutside(folder, output);
+    const fs::path source = folder / "movie.mp4";
+    if (!fs::exists(fs::symlink_status(source, error))) {
+        requireSaved(folder, output);
         if (deletesFolder)
-            fs::remove_all(folder, error);
+            removeRecovered(folder);
         return ExitFine;
     }
-    const fs::path source = folder / "movie.mp4";
     const FileHandle movie(open(source.c_str(), O_RDONLY | O_CLOEXEC));
     if (!movie)
         throw Failure(fmt::format("{}: cannot be opened: {}", source.string(), std::strerror(errno)));
@@ -222,7 +276,7 @@ int recover(const fs::path& givenFolder, const fs::path& givenOutput, bool delet
         save.attach(findings.streams);
     save.stamp("zulm record", ZULM_VERSION);
 
-    if (!isReadable(draft.path(), findings.streams.size()))
+    if (!holdsAll(draft.path(), findings.files))
         findings.lose(fmt::format("{}: cannot be read back; nothing was removed", output.string()));
     if (hasOutput && !haveSameBytes(draft.path(), output))
         throw Refusal(fmt::format("{}: exists and is another movie; name another one with -o", output.string()));
@@ -230,7 +284,7 @@ int recover(const fs::path& givenFolder, const fs::path& givenOutput, bool delet
         renameWithoutReplacing(draft.path(), output);
     syncFolder(output.parent_path());
     if (deletesFolder && !findings.hasLoss)
-        fs::remove_all(folder, error);
+        removeRecovered(folder);
     return findings.hasLoss ? ExitLoss : ExitFine;
 }
 

@@ -191,6 +191,8 @@ public:
                 note(complainAboutRest(file_, stream, file_.examine(stream).readableBytes));
         const Recording recording(file_.bytes(), file_.name());
         InsightSources sources = insightSourcesOf(recording, [this](const Error& error) {
+            if (error.code())
+                throw error;
             complain(error.what());
             note(ExitDamaged);
         });

@@ -10,7 +10,9 @@
 
 #include <fmt/core.h>
 
+#include <cerrno>
 #include <cmath>
+#include <cstring>
 #include <fstream>
 
 namespace Zulm {
@@ -37,12 +39,16 @@ RetimedStreams::RetimedStreams(const Recording& recording, const EditList& edits
     : name_(recording.name()),
       file_(std::make_unique<TemporaryFile>(folder.empty() ? "." : folder, "streams", ".dat")) {
     std::ofstream output = openOutput(file_->path(), file_->path());
-    edited_ = retimed(recording, edits, [&output](std::string_view bytes) {
+    const auto requireGood = [&] {
+        if (!output)
+            throw Failure(fmt::format("{}: cannot be written: {}", file_->path(), std::strerror(errno)));
+    };
+    edited_ = retimed(recording, edits, [&](std::string_view bytes) {
         output.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+        requireGood();
     });
     output.close();
-    if (!output)
-        throw Failure(fmt::format("{}: cannot be written; is the disk full?", file_->path()));
+    requireGood();
     const ByteSource retimedBytes = openSource(file_->path(), file_->path());
     for (EditedStream& stream : edited_.streams)
         if (!stream.isCopied)

@@ -195,7 +195,11 @@ ExitCode showStates(const StateOptions& options, RunReport& report) {
         return complainAboutNothing(recording.name(), {});
     Timeline timeline(
         recording,
-        [&recording](const Error& error) { warn(fmt::format("{}: {}", recording.name(), error.sentence())); },
+        [&recording](const Error& error) {
+            if (error.code())
+                throw error; // what holds would be said to be unknown
+            warn(fmt::format("{}: {}", recording.name(), error.sentence()));
+        },
         options.interpolation);
     if (report.isWanted())
         report.beginFile(recording.name()).beginArray("states");

@@ -69,8 +69,8 @@ TemporaryFile::TemporaryFile(const std::string& folder, const std::string& name,
 }
 
 TemporaryFile::~TemporaryFile() {
-    if (!isReleased_)
-        unlink(path_.c_str());
+    if (!isReleased_ && unlink(path_.c_str()) != 0)
+        unlink(path_.c_str()); // a disk may refuse once
     forget(path_);
 }
 

@@ -8,6 +8,7 @@
 #include "ZULMetaDataSession/EditLists/ListBuilder.h"
 
 #include <algorithm>
+#include <utility>
 
 namespace ZULMetaData::detail {
 
@@ -61,6 +62,7 @@ bool takeRow(std::string_view& text, char separator, std::vector<std::string>& f
     constexpr std::size_t mostFields = 3;
     fields.assign(1, {});
     bool isQuoted = false;
+    bool isAtStart = true;  // whether this is the first character of its field
     bool isIgnored = false; // whether this is a further field
     while (!text.empty()) {
         const char c = text.front();
@@ -70,11 +72,12 @@ bool takeRow(std::string_view& text, char separator, std::vector<std::string>& f
         }
         const bool isDoubled = isQuoted && text.starts_with("\"\"");
         text.remove_prefix(isDoubled ? 2 : 1);
+        const bool isFirst = std::exchange(isAtStart, c == separator && !isQuoted);
         if (c == separator && !isQuoted) {
             isIgnored = fields.size() == mostFields;
             if (!isIgnored)
                 fields.emplace_back();
-        } else if (c == '"' && !isDoubled && (isQuoted || isIgnored || fields.back().empty())) {
+        } else if (c == '"' && !isDoubled && (isQuoted || isFirst)) {
             isQuoted = !isQuoted;
         } else if (!isIgnored) {
             fields.back() += c;

@@ -64,6 +64,7 @@ public:
     EditList read() {
         const ContainerItem moov = require(first(atoms_, "moov"), "the movie has no header");
         movieTimescale_ = timescaleIn(require(child(moov, "mvhd"), "the movie's header has no timescale"));
+        isInFragments_ = child(moov, "mvex").has_value();
         ItemWalk children = atoms_.inside(moov);
         while (const auto trak = nextOf(children, "trak"))
             if (isOfPictures(*trak)) {
@@ -132,14 +133,16 @@ private:
             list_.moveTo("edit", number);
             if (time < 0)
                 list_.fail("it is empty, which an edit list cannot say");
-            addEdit(Rational(time) / timescale, length, Rational(rate, 0x10000));
+            addEdit(Rational(time) / timescale, length, Rational(rate, 0x10000), isInFragments_ && number == count);
         }
     }
 
     /// The last edit of a movie in fragments has the length 0: it lasts until the end.
-    void addEdit(const Rational& start, std::uint64_t length, const Rational& speed) {
+    void addEdit(const Rational& start, std::uint64_t length, const Rational& speed, bool canLastUntilTheEnd) {
         if (length != 0)
             list_.play(start, rationalOf(length) / movieTimescale_, speed);
+        else if (!canLastUntilTheEnd)
+            list_.fail("it has no length");
         else if (options_.duration)
             list_.keep(start, *options_.duration, speed);
         else
@@ -150,6 +153,7 @@ private:
     const EditListOptions& options_;
     ItemWalk atoms_;
     Rational movieTimescale_;
+    bool isInFragments_ = false;
 };
 
 } // namespace

@@ -19,7 +19,7 @@ class SpanWithin {
 public:
     SpanWithin(const ActivitySpan& span, double duration)
         : start_(std::clamp(span.start, 0.0, duration)), end_(std::clamp(span.end, start_, duration)),
-          containsEnd_(span.end >= duration) {}
+          containsEnd_(span.end >= duration && (span.start < duration || duration == 0)) {}
 
     double start() const { return start_; }
     double end() const { return end_; }

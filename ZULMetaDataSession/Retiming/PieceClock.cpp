@@ -7,9 +7,9 @@ namespace ZULMetaData::detail {
 
 namespace {
 
-/// Beyond these magnitudes, products might leave the range of doubles or lose digits.
+/// Beyond these magnitudes, products might leave the range of doubles or lose digits, and what is in doubt could be 0.
 constexpr double s_mostMagnitude = 0x1p+500;
-constexpr double s_leastMagnitude = 0x1p-500;
+constexpr double s_leastMagnitude = 0x1p-400;
 
 /// More than what the computation with two doubles can be wrong by, as a part of its largest number. Its error is a few
 /// units of 2^-106.

@@ -46,7 +46,7 @@ class Failure(NamedTuple):
 def _paths_of(recordings: _Path | Iterable[_Path]) -> Iterator[str]:
     if not isinstance(recordings, (str, os.PathLike)):
         yield from (os.fspath(path) for path in recordings)
-    elif glob.has_magic(os.fspath(recordings)):
+    elif glob.has_magic(os.fspath(recordings)) and not os.path.lexists(recordings):
         yield from sorted(glob.iglob(os.fspath(recordings), recursive=True))
     else:
         yield os.fspath(recordings)
@@ -171,7 +171,7 @@ class Scan:
             raise ValueError(f"the columns of {kind} are {', '.join(names)}, each at most once, not {', '.join(fields)}")
         if on_error not in ("raise", "skip", "report"):
             raise ValueError(f"on_error is 'raise', 'skip' or 'report', not {on_error!r}")
-        self._recordings = recordings
+        self._recordings = tuple(recordings) if isinstance(recordings, Iterator) else recordings  # iterators end
         self._on_error: OnError = on_error
         self._reader = Reader(kind, fields, on_error)
         self._failures: list[Failure] = []

@@ -65,6 +65,16 @@ def test_takes_a_path_a_pattern_of_folders_and_an_iterable(recordings):
     assert [len(batch.time) for batch in some] == [7, 2]
 
 
+def test_reads_the_recordings_of_an_iterator_again(recordings):
+    scan = zulmetadata.scan(recordings.glob("[23].dat"), KIND)
+    assert [len(list(scan)) for _ in range(2)] == [2, 2]
+
+
+def test_the_path_of_a_file_that_is_there_is_no_pattern(recordings):
+    (recordings / "4.dat").rename(recordings / "Talk [1].dat")
+    assert [len(batch.time) for batch in zulmetadata.scan(recordings / "Talk [1].dat", KIND)] == [4]
+
+
 def test_a_recording_without_the_kind_is_no_failure(recordings):
     titles = zulmetadata.scan(pattern(recordings), "topmostWindowTitle", on_error="report")
     assert list(titles) == [] and titles.failures == []

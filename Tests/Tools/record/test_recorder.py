@@ -651,6 +651,51 @@ class Loss(Test):
             self.assertEqual(subprocess.run(command, check=False, capture_output=True).returncode, 1)
             self.assertEqual(os.listdir(folder), ["a.mp4.recording"])
 
+    def recover(self, *arguments):
+        command = [PROGRAMS["recorder"], "--recover", *[str(argument) for argument in arguments]]
+        return subprocess.run(command, check=False, capture_output=True).returncode
+
+    def test_a_folder_of_somebody_else_is_never_removed(self):
+        """Whatever OUT is, only what was recorded there is removed, and only if OUT holds it."""
+        with tempfile.TemporaryDirectory() as name:
+            output = pathlib.Path(name) / "Talk.mp4"
+            output.write_bytes(struct.pack(">I4s4sI", 16, b"ftyp", b"isom", 0))
+            folder = pathlib.Path(name) / "Letters"
+            folder.mkdir()
+            letter = folder / "letter.txt"
+            letter.write_text("Dear", encoding="utf-8")
+            self.assertEqual(self.recover(folder, "-o", output, "--delete"), 1)
+            self.assertEqual(self.recover(folder, "-o", output), 1)
+            self.assertEqual(os.listdir(folder), ["letter.txt"])
+            stream = folder / "topmostAppName.dat"  # which OUT does not hold
+            shutil.copy(pathlib.Path(__file__).parents[2] / "Data/invalid/text-torn-in-size.dat", stream)
+            self.assertEqual(self.recover(folder, "-o", output, "--delete"), 1)
+            self.assertEqual(sorted(os.listdir(folder)), ["letter.txt", "topmostAppName.dat"])
+
+    def test_only_files_of_the_recorder_are_deleted(self):
+        with Desk(manager=None) as desk:
+            recording = desk.record()
+            time.sleep(3)  # so that there are whole fragments
+            end(recording.process, signal.SIGKILL)
+            letter = recording.folder / "letter.txt"
+            letter.write_text("Dear", encoding="utf-8")
+            inside = recording.folder / "inside.mp4"
+            self.assertEqual(self.recover(recording.folder, "-o", inside, "--delete"), 2)
+            self.assertFalse(inside.exists())
+            saved = desk.folder / "saved"  # as if the recorder was killed while it removed its files
+            shutil.copytree(recording.folder, saved)
+            (saved / "movie.mp4").unlink()
+            self.assertEqual(self.recover(recording.folder, "--delete"), 0)
+            self.assertEqual(os.listdir(recording.folder), ["letter.txt"])
+            self.assertTrue(streams_of_movie(recording.output))
+            other = desk.folder / "other.mp4"
+            other.write_bytes(recording.output.read_bytes()[:1000])
+            before = sorted(os.listdir(saved))
+            self.assertEqual(self.recover(saved, "-o", other, "--delete"), 1)
+            self.assertEqual(sorted(os.listdir(saved)), before)
+            self.assertEqual(self.recover(saved, "-o", recording.output, "--delete"), 0)
+            self.assertEqual(os.listdir(saved), ["letter.txt"])
+
 
 class Privacy(Test):
     """With the accessibility bus, whose address is that of the root window of the desk."""

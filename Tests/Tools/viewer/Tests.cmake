@@ -31,7 +31,7 @@ if(ZULM_VIEWER AND CHROMIUM)
       COMMAND ${CMAKE_COMMAND} -E env ${viewer_settings} ${NODE} --test ${viewer_tests}/${test}.test.mjs)
     set_tests_properties(viewer/${test} PROPERTIES TIMEOUT 600)
   endforeach()
-  set_tests_properties(viewer/frames PROPERTIES RUN_SERIAL TRUE)
+  set_tests_properties(viewer/frames viewer/long viewer/speed PROPERTIES RUN_SERIAL TRUE)
 
   # The pictures of the documentation.
   set(recorder_setting "")

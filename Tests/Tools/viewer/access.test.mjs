@@ -5,7 +5,7 @@ import { readFileSync, writeFileSync } from 'node:fs';
 import { join } from 'node:path';
 import { test } from 'node:test';
 import { attached, positionsOf } from './numbered.mjs';
-import { axeSource, emptyPage, folder, open, opened, ready, recordedSession, seek } from './support.mjs';
+import { axeSource, emptyPage, folder, open, opened, ready, recordedSession, seek, waitUntil } from './support.mjs';
 
 const recording = recordedSession();
 const empty = join(folder, 'empty.html');
@@ -214,18 +214,18 @@ test('bands, rests and other clicks can be told without fine colours', async () 
   for (const theme of ['light', 'dark']) {
     const { page, close } = await open(recording.page, { theme });
     await opened(page);
-    await page.waitForTimeout(300);
     const placeOf = async (title) => {
       const label = await page.locator('.lane-label', { hasText: title }).boundingBox();
       const body = await page.locator('.lanes-body').boundingBox();
       return { top: label.y - body.y, height: label.height - 1, width: body.width };
     };
     for (const title of ['Application', 'Hover']) {
-      const { top, height, width } = await placeOf(title);
-      const edge = { left: width * 0.3, top: top + 2, width: width * 0.3, height: 3 }; // above the names
-      const contrast = await page.evaluate(contrastIn, edge);
-      assert.ok(contrast >= 3, `${theme}: ${title} ${contrast.toFixed(2)}`);
-      assert.ok(height > 10);
+      const contrast = async () => {
+        const { top, width } = await placeOf(title);
+        return page.evaluate(contrastIn, { left: width * 0.3, top: top + 2, width: width * 0.3, height: 3 }); // above the names
+      };
+      await waitUntil(contrast, (contrast) => contrast >= 3, (contrast) => `${theme}: ${title} ${contrast.toFixed(2)}`);
+      assert.ok((await placeOf(title)).height > 10);
     }
     // At half its height a disc is as wide as a square, near its top it is not.
     const { top, width } = await placeOf('Clicks');
@@ -247,10 +247,11 @@ test('bands, rests and other clicks can be told without fine colours', async () 
 
     const rest = await open(rested.page, { theme });
     await opened(rest.page);
-    await rest.page.waitForTimeout(300);
-    const body = await rest.page.locator('.lanes-body').boundingBox();
-    const contrast = await rest.page.evaluate(contrastIn, { left: body.width * 0.2, top: 0, width: 40, height: 3 });
-    assert.ok(contrast >= 3, `${theme}: a rest ${contrast.toFixed(2)}`);
+    const contrast = async () => {
+      const { width } = await rest.page.locator('.lanes-body').boundingBox();
+      return rest.page.evaluate(contrastIn, { left: width * 0.2, top: 0, width: 40, height: 3 });
+    };
+    await waitUntil(contrast, (contrast) => contrast >= 3, (contrast) => `${theme}: a rest ${contrast.toFixed(2)}`);
     await rest.close();
   }
 });
@@ -312,7 +313,7 @@ test('units and words are those of the reader', async () => {
   await page.keyboard.press('7');
   await page.locator('#heat-legend').waitFor({ state: 'visible' });
   await page.getByRole('tab', { name: 'Facts' }).click();
-  assert.match(await page.locator('#pane-facts').innerText(), /Memory\s+[\d.]+ GB/);
+  await waitUntil(() => page.locator('#pane-facts').innerText(), (text) => /Memory\s+[\d.]+ GB/.test(text));
   assert.doesNotMatch(await page.locator('body').innerText(), /keystroke/i);
   await close();
 });

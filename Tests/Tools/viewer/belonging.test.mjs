@@ -6,7 +6,7 @@ import { readFileSync, writeFileSync } from 'node:fs';
 import { join } from 'node:path';
 import { test } from 'node:test';
 import { ffmpeg, pixelsOf, settled } from './numbered.mjs';
-import { emptyPage, folder, open, opened, ready, recordedSession, seek, state, textOf, zulm } from './support.mjs';
+import { emptyPage, folder, open, opened, ready, recordedSession, seek, state, textOf, waitUntil, zulm } from './support.mjs';
 
 const recording = recordedSession();
 const empty = join(folder, 'empty.html');
@@ -33,13 +33,11 @@ const drawn = (page, colour) =>
     return count;
   }, colour);
 
-const appears = async (page, colour) => {
-  for (let i = 0; i < 100; ++i) {
-    if ((await drawn(page, colour)) > 20) return;
-    await page.waitForTimeout(100);
-  }
-  assert.fail(`nothing of the colour ${colour} is drawn`);
-};
+const appears = (page, colour) =>
+  waitUntil(() => drawn(page, colour), (count) => count > 20, (count) => `${count} pixels of the colour ${colour}`);
+
+const disappears = (page, colour) =>
+  waitUntil(() => drawn(page, colour), (count) => count < 5, (count) => `${count} pixels of the colour ${colour}`);
 
 /// The objects anywhere in a document that have all these members.
 function objectsWith(value, ...names) {
@@ -59,17 +57,17 @@ for (const [key, colour] of Object.entries(layers))
       await page.keyboard.press(key);
       await appears(page, colour);
       await page.keyboard.press(key);
-      await page.waitForTimeout(200);
-      assert.ok((await drawn(page, colour)) < 5);
+      await disappears(page, colour);
     }));
 
 test('the suggested zoom shows what the camera of the library shows', () =>
   shown(async (page) => {
     const zoom = objectsWith(insights, 'start', 'end', 'factor', 'places')[0];
-    await page.evaluate((time) => zulmViewer.seek(time), zoom.start - 0.5);
     await page.keyboard.press('8');
-    await page.waitForTimeout(500);
-    assert.ok((await drawn(page, layers[8])) < 5, 'there is no zoom yet');
+    await seek(page, zoom.start + 2);
+    await appears(page, layers[8]);
+    await seek(page, zoom.start - 0.5); // there is no zoom yet
+    await disappears(page, layers[8]);
     await seek(page, zoom.start + 2);
     await appears(page, layers[8]);
     const left = await page.evaluate(([red, green, blue]) => {

@@ -3,7 +3,7 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
 import { after, look, numberedRecording, settled, watch } from './numbered.mjs';
-import { open, opened, ready } from './support.mjs';
+import { open, opened, ready, waitUntil } from './support.mjs';
 
 const recordings = {
   10: numberedRecording('Ten', { rate: 10, seconds: 4 }),
@@ -19,7 +19,7 @@ async function shown(recording, work) {
   await opened(page);
   await ready(page);
   await settled(page);
-  await page.waitForTimeout(200);
+  await waitUntil(() => look(page), ({ time }) => Number.isFinite(time), () => 'no cursor is drawn');
   await work(page);
   assert.deepEqual(problems, []);
   await close();

@@ -6,7 +6,7 @@ import { join } from 'node:path';
 import { test } from 'node:test';
 import { deflateSync } from 'node:zlib';
 import { attached, ffmpeg, imageEntry, imagesOf, positionsOf, regionOf, stream } from './numbered.mjs';
-import { emptyPage, folder, open, opened, ready, recordedSession, seek, setting, state, textOf, zulm } from './support.mjs';
+import { drawn, emptyPage, folder, open, opened, ready, recordedSession, seek, setting, state, textOf, waitUntil, zulm } from './support.mjs';
 
 const recording = recordedSession();
 const empty = join(folder, 'empty.html');
@@ -215,14 +215,14 @@ test('cursor images that are larger than any cursor are never decoded', async ()
   await opened(page);
   await ready(page);
   await seek(page, 1.5);
-  await page.waitForTimeout(300);
-  assert.deepEqual(await page.evaluate(() => [...new Set(decoded)]), [small.length]); // the table shows it as well
-  const arrow = await page.evaluate(() => {
+  await page.waitForFunction(() => {
     const canvas = document.getElementById('overlay');
     const { data } = canvas.getContext('2d').getImageData(0, 0, canvas.width, canvas.height);
-    return data.some((value, i) => i % 4 === 3 && value > 200);
+    return data.some((value, i) => i % 4 === 3 && value > 200); // an arrow stands for it
   });
-  assert.ok(arrow, 'an arrow stands for it');
+  await page.waitForFunction(() => decoded.length > 0 && document.querySelector('.table-row'));
+  await drawn(page);
+  assert.deepEqual(await page.evaluate(() => [...new Set(decoded)]), [small.length]); // the table shows it as well
   assert.deepEqual(problems, []);
   await close();
 });
@@ -247,13 +247,12 @@ test('signs that turn or hide a text are shown, and nothing after them is lost',
   const { page, close } = await open(path);
   await opened(page);
   await page.getByLabel('Stream', { exact: true }).selectOption('topmostWindowTitle');
-  const cells = await page.locator('.table-row:visible').allInnerTexts();
-  assert.match(cells.join('\n'), /invoice\[U\+202E\]fdp\.exe/);
-  assert.match(cells.join('\n'), /first␀second/);
+  const cells = async () => (await page.locator('.table-row:visible').allInnerTexts()).join('\n');
+  await waitUntil(cells, (text) => /invoice\[U\+202E\]fdp\.exe/.test(text) && /first␀second/.test(text));
   await seek(page, 0.5);
   assert.equal(await textOf(page, '.lane-label:has-text("Window") .lane-value'), 'invoice[U+202E]fdp.exe');
   await page.getByLabel('Filter entries').fill('second');
-  assert.match(await textOf(page, '.entries-status'), /^1 of 2/);
+  await page.waitForFunction(() => /^1 of 2/.test(document.querySelector('.entries-status').textContent));
   await close();
 
   const name = join(folder, 'evil\u202E4pm.exe.dat');

@@ -6,7 +6,7 @@ import { mkdirSync, readFileSync, renameSync } from 'node:fs';
 import { join } from 'node:path';
 import { test } from 'node:test';
 import { ffmpeg } from './numbered.mjs';
-import { folder, open, opened, ready, recordedSession, seek, state, textOf, zulm } from './support.mjs';
+import { drawn, folder, open, opened, ready, recordedSession, seek, state, textOf, waitUntil, zulm } from './support.mjs';
 
 const recording = recordedSession();
 
@@ -135,18 +135,23 @@ test('a selection loops', () =>
     const wraps = () => times.filter((time, i) => i > 0 && time < times[i - 1] - 0.2).length >= 2;
     await page.waitForFunction(wraps, null, { timeout: 30_000 });
     const [least, most] = await page.evaluate(() => [Math.min(...times.slice(3)), Math.max(...times.slice(3))]);
-    assert.ok(least > 2.9 && most < 3.8, `${least} to ${most}`);
+    assert.ok(least > 2.9 && most < 4.5, `${least} to ${most}`); // a busy browser leaves out pictures
+    const staysBeyond = () => times.some((time, i) => time >= 3.6 && times[i + 1] >= 3.6);
+    assert.ok(!(await page.evaluate(staysBeyond)), 'the first picture after the end leads back');
     await page.keyboard.press('Space');
   }));
 
 test('the heat map can tell of the selection alone', () =>
   shown(async (page) => {
     await seek(page, 10);
+    for (const layer of ['1', '2', '3', '4', '5']) await page.keyboard.press(layer); // nothing that is decoded first
     await page.keyboard.press('7');
     const picture = () => page.evaluate(() => document.getElementById('overlay').toDataURL());
     await page.locator('#heat-legend').waitFor({ state: 'visible' });
     await select(page, 1, 2);
     await seek(page, 10);
+    await factsOf(page); // the bar has its size
+    await drawn(page);
     const whole = await picture();
     await page.getByRole('button', { name: 'Heat map' }).click();
     await page.waitForFunction((whole) => document.getElementById('overlay').toDataURL() !== whole, whole);
@@ -162,10 +167,10 @@ test('a link holds the selection', async () => {
   await page.context().grantPermissions(['clipboard-read', 'clipboard-write']);
   await page.getByLabel('Copy a link').click();
   const copied = () => page.evaluate(() => navigator.clipboard.readText());
-  assert.match(await copied(), /Recording\.html#t=2&range=1\.5-3$/);
+  await waitUntil(copied, (text) => /Recording\.html#t=2&range=1\.5-3$/.test(text));
   await factsOf(page);
   await page.getByLabel('Copy', { exact: true }).click();
-  await page.waitForFunction(() => navigator.clipboard.readText().then((text) => text.startsWith('From')));
+  await waitUntil(copied, (text) => text.startsWith('From'));
   assert.match(await copied(), /^From\t0:01\.500\nTo\t0:03\.000\nLength\t1\.5 s\nClicks\t\d+\nKeys\t\d+\nIdle\t\S+\nDistance\t[\d,]+ px\n/);
   await page.evaluate(() => (location.hash = '#t=5&range=4-6'));
   await selected(page, 4, 6, 1e-9);

@@ -187,6 +187,22 @@ export async function seek(page, time) {
   );
 }
 
+/// Lets the page draw what it has been asked for.
+export function drawn(page) {
+  return page.evaluate(() => new Promise((done) => requestAnimationFrame(() => requestAnimationFrame(done))));
+}
+
+/// Reads a value until it is the wanted one, and returns it. `waitForFunction` does not wait for promises.
+export async function waitUntil(read, isWanted = Boolean, words = String) {
+  const end = Date.now() + 30_000;
+  for (;;) {
+    const value = await read();
+    if (isWanted(value)) return value;
+    if (Date.now() > end) assert.fail(`after 30 seconds: ${words(value)}`);
+    await new Promise((done) => setTimeout(done, 50));
+  }
+}
+
 /// The visible words of an element.
 export function textOf(page, selector) {
   return page.locator(selector).innerText();

@@ -113,7 +113,10 @@ test('texts sort as people do, and all streams by their names', () =>
 
 test('cursors are shown in the table as they look', () =>
   withStream('cursorImage', async (page) => {
-    await page.waitForFunction(() => document.querySelectorAll('.table-row .thumbnail.is-decoded').length > 2);
+    await page.waitForFunction(() => {
+      const rows = [...document.querySelectorAll('.table-row')].filter(({ hidden }) => !hidden);
+      return rows.length > 2 && rows.every((row) => row.querySelector('.thumbnail.is-decoded'));
+    });
     const shown = await page.evaluate(() =>
       [...document.querySelectorAll('.table-row')]
         .filter(({ hidden, querySelector }) => !hidden)

@@ -87,6 +87,11 @@ TEST(CutTable, ReadsRowsOfStartEndAndLabel) {
     EXPECT_THAT(piecesOf("1,2\r\n\r\n3,4,a,b,\"c\"\r\n", "cuts.txt"), ElementsAre("1-2@1=1", "3-4@1=1"));
 }
 
+TEST(CutTable, TakesQuotationMarksInsideAFieldForThemselves) {
+    EXPECT_THAT(piecesOf("1,2,a,12\"\n3,4,b,15\"\n5,6,7\",\n", "a.csv"), ElementsAre("1-2@1=1", "3-4@1=1", "5-6@1=1"));
+    EXPECT_THAT(piecesOf("1,2,a,\"12\n\",\"\"\n3,4\n", "a.csv"), ElementsAre("1-2@1=1", "3-4@1=1"));
+}
+
 TEST(CutTable, ReadsTabsAndTimeCodes) {
     EXPECT_THAT(piecesOf("00:00:10.500\t00:01:00.000\ta, b\n", "a.tsv"), ElementsAre("21/2-60@1=99/2"));
     EXPECT_THAT(piecesOf("\t00:01:00.000\t\n", "a.tsv"), ElementsAre("0-60@1=60"));

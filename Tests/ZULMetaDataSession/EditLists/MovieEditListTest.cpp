@@ -32,10 +32,14 @@ std::string editList(std::uint32_t count, const std::string& edits, std::uint32_
 }
 
 /// Returns a movie that counts 600 units for each second, with media that counts 90,000.
-std::string movie(const std::string& edts) {
+std::string movie(const std::string& edts, const std::string& end = {}) {
     const std::string sound = atom("trak", media("soun", header("mdhd", 48000)));
     return atom("ftyp", "qt  ") +
-           atom("moov", header("mvhd", 600) + sound + atom("trak", edts + media("vide", header("mdhd", 90000))));
+           atom("moov", header("mvhd", 600) + sound + atom("trak", edts + media("vide", header("mdhd", 90000))) + end);
+}
+
+std::string fragmentedMovie(const std::string& edts) {
+    return movie(edts, atom("mvex"));
 }
 
 TEST(MovieEditList, PlaysItsEdits) {
@@ -64,10 +68,18 @@ TEST(MovieEditList, RefusesEmptyEdits) {
                 ElementsAre("a.mov: edit 2: it is empty, which an edit list cannot say"));
 }
 
-TEST(MovieEditList, LastsUntilTheEndIfAnEditHasNoLength) {
-    EXPECT_THAT(piecesOf(movie(editList(1, edit(0, 90000))), "a.mov", ofDuration(10)), ElementsAre("1-10@1=9"));
-    EXPECT_THAT(piecesOf(movie(editList(1, edit(0, 90000))), "a.mov"),
-                ElementsAre("a.mov: edit 1: it lasts until the end, and the duration of the recording is not known"));
+TEST(MovieEditList, LastsUntilTheEndIfTheLastEditOfAFragmentedMovieHasNoLength) {
+    const std::string edits = editList(2, edit(600, 0) + edit(0, 90000));
+    EXPECT_THAT(piecesOf(fragmentedMovie(edits), "a.mov", ofDuration(10)), ElementsAre("0-1@1=1", "1-10@1=9"));
+    EXPECT_THAT(piecesOf(fragmentedMovie(edits), "a.mov"),
+                ElementsAre("a.mov: edit 2: it lasts until the end, and the duration of the recording is not known"));
+}
+
+TEST(MovieEditList, RefusesOtherEditsWithoutALength) {
+    EXPECT_THAT(piecesOf(movie(editList(1, edit(0, 90000))), "a.mov", ofDuration(10)),
+                ElementsAre("a.mov: edit 1: it has no length"));
+    EXPECT_THAT(piecesOf(fragmentedMovie(editList(2, edit(0, 90000) + edit(600, 0))), "a.mov", ofDuration(10)),
+                ElementsAre("a.mov: edit 1: it has no length"));
 }
 
 TEST(MovieEditList, RefusesMoviesWithoutOne) {

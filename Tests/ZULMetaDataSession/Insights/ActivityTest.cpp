@@ -92,6 +92,15 @@ TEST(Activity, CutsIdleTimeAtTheEdgesOfTheSpan) {
     EXPECT_EQ(activityIn(sources, 8, 10).idle, 1);
 }
 
+TEST(Activity, CountsTheEndOfTheRecordingOnce) {
+    InsightSources sources;
+    sources.keys = keys({{10, {'a', 0}}});
+    sources.duration = 10;
+    EXPECT_EQ(activityIn(sources, 5, 10).keys, 1U);
+    EXPECT_EQ(activityIn(sources, 10, 20).keys, 0U);
+    EXPECT_EQ(activityIn(sources, 12, 15).keys, 0U);
+}
+
 TEST(Activity, LiesWithinTheRecording) {
     const Activity activity = activityIn(session(), -5, 1e300);
     EXPECT_EQ(activity.start, 0);

@@ -41,7 +41,7 @@ export class Selection {
     this.changed();
   }
 
-  /// The range begins at `time`, and ends where it did if that is later.
+  /// The range begins at `time`. Its end stays if it is later.
   setIn(time: number): void {
     const { to } = this.selected ?? { to: this.duration };
     this.select(time, to > time ? to : this.duration);
@@ -52,7 +52,7 @@ export class Selection {
     this.select(from < time ? from : 0, time);
   }
 
-  /// From where the selection began to `time`; it begins at `start` if there is none.
+  /// The selection ends at `time`. A new one begins at `start`.
   extend(start: number, time: number): void {
     this.select(this.selected ? this.anchor : start, time);
   }

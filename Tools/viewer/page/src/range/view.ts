@@ -26,7 +26,7 @@ export class SelectionView {
     for (const name of ['from', 'to'] as const) this.drag(this.edges[name], name, onSelect);
   }
 
-  /// The other edge stays where it is.
+  /// The other edge stays.
   private drag(edge: HTMLElement, name: 'from' | 'to', onSelect: (one: number, other: number) => void): void {
     let [fixed, start] = [0, 0];
     dragging(edge, {

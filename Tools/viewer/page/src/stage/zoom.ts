@@ -10,7 +10,7 @@ export class StageZoom {
   y = 0;
   onChange: () => void = () => {};
 
-  /// Around a point of the stage, in parts of it, which stays where it is.
+  /// Zooms around a point of the stage, in parts of it. That point does not move.
   by(factor: number, x = 0.5, y = 0.5): void {
     const scale = Math.max(1, Math.min(this.scale * factor, most));
     const shift = 1 / this.scale - 1 / scale;
