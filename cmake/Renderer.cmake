@@ -13,6 +13,6 @@ endif()
 find_package(PkgConfig ${wanted})
 if(PkgConfig_FOUND)
   pkg_check_modules(ZULMETADATA_RENDERER_LIBRARIES ${wanted} IMPORTED_TARGET
-    libavcodec>=59 libavfilter libavformat>=59 libavutil libswresample libswscale cairo pangocairo)
+    libavcodec>=59.37 libavfilter>=8.44 libavformat>=59.27 libavutil>=57.28 libswresample>=4.7 libswscale>=6.7 cairo pangocairo)
   set(ZULMETADATA_RENDERER ${ZULMETADATA_RENDERER_LIBRARIES_FOUND})
 endif()

@@ -52,4 +52,3 @@ target_compile_definitions(ToolsTests PRIVATE
   ZULM_HAS_PAGE=$<BOOL:${ZULM_VIEWER}>)
 add_dependencies(ToolsTests zulm)
 include(${CMAKE_CURRENT_LIST_DIR}/record/Tests.cmake)
-include(${CMAKE_CURRENT_LIST_DIR}/render/Tests.cmake)

@@ -98,9 +98,10 @@ Backdrop::Backdrop(const Stage& stage, const Style& style, ColourMatrix matrix) 
     paintShadow(film, stage, style.frame);
     picture_ = yuvOf(film.pixels, film.place.width, film.place.height, matrix);
 
-    const double radius = stage.points(style.frame.cornerRadius);
-    const int size = (static_cast<int>(std::ceil(radius)) + 1) & ~1;
     const PixelRect& frame = stage.frame();
+    const int half = std::min(frame.width, frame.height) / 2;
+    const double radius = std::min<double>(half, stage.points(style.frame.cornerRadius));
+    const int size = std::min((static_cast<int>(std::ceil(radius)) + 1) & ~1, half & ~1);
     if (size == 0)
         return;
     const SurfacePointer whole = surfaceOf(film.pixels, film.place.width, film.place.height);

@@ -1,5 +1,6 @@
 #include "Tools/render/Film.h"
 
+#include "Reports/Text.h"
 #include "Tools/render/Gif.h"
 #include "Tools/render/Production.h"
 #include "Tools/render/SoundTrack.h"
@@ -10,7 +11,6 @@
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
-#include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
 #include <fmt/core.h>
 
@@ -32,8 +32,8 @@ constexpr double s_gifFps = 12;
 constexpr int s_paletteFrames = 24;
 
 EditList editsFor(const RenderOptions& options, const Production& production) {
-    if (options.idle)
-        return production.withoutIdle(*options.idle, options.rest);
+    if (options.removesIdle)
+        return production.withoutIdle(options.idleLeast, options.idleRest);
     const Zulm::EditOptions& edits = options.edits;
     const bool isCut = !edits.file.empty() || !edits.kept.empty() || !edits.removed.empty();
     return isCut ? Zulm::editsOf(edits, production.recording()) : production.whole();
@@ -55,14 +55,6 @@ void drawFrames(Production& production, double fps, const std::string& name, Dra
     }
 }
 
-void attachStreams(Production& production, const std::string& movie, const std::string& name) {
-    try {
-        SafeMovieSave(movie).attach(production.streams());
-    } catch (const SaveError& error) {
-        throw Failure(fmt::format("{}: {}; nothing was written", name, error.sentence()));
-    }
-}
-
 /// How much of the work was drawing. The times are those of processors, so that other programs do not count.
 void sayTimes(const Composer& composer, double length) {
     timespec time{};
@@ -74,13 +66,15 @@ void sayTimes(const Composer& composer, double length) {
 
 ExitCode renderFilm(const RenderOptions& options, Production& production, const EditList& edits) {
     FilmWriter::requireCodec(options.film.codec);
-    Zulm::OutputFile output(options.output, {options.recording, options.edits.file, options.style}, options.force);
+    Zulm::OutputFile output(options.output, inputsOf(options), options.force);
     FilmSettings settings = options.film;
     std::unique_ptr<SoundTrack> sound;
     if (!options.isSilent)
         sound = std::make_unique<SoundTrack>(production.path(), options.recording, edits);
     if (sound && sound->hasSound())
         settings.soundRate = sound->rate();
+    if (settings.soundRate > 0 && !options.redactions.empty())
+        Zulm::warn(fmt::format("{}: its sound is not covered; --no-sound leaves it out", options.recording));
     const double length = production.session().times().duration();
     FilmWriter writer(output.temporaryPath(), options.output, settings, production.size().width,
                       production.size().height,
@@ -92,14 +86,12 @@ ExitCode renderFilm(const RenderOptions& options, Production& production, const 
     });
     writer.finish();
     sayTimes(production.composer(), length);
-    const EditedRecording& edited = production.session().edited();
-    if (!edited.streams.empty())
-        attachStreams(production, output.temporaryPath(), options.output);
+    const std::size_t streams = production.streams().attachTo(output.temporaryPath(), options.output).streams.size();
     output.commit();
     if (!Zulm::settings().quiet)
-        Zulm::writeOutput(fmt::format("{}: {:.3f} s, {} x {}, {} stream{}\n", options.output, length,
-                                      production.size().width, production.size().height, edited.streams.size(),
-                                      edited.streams.size() == 1 ? "" : "s"));
+        Zulm::writeOutput(fmt::format("{}: {:.3f} s, {} x {}, {} stream{}\n", Zulm::shown(options.output), length,
+                                      production.size().width, production.size().height, streams,
+                                      streams == 1 ? "" : "s"));
     return production.complain();
 }
 
@@ -107,7 +99,7 @@ ExitCode renderGif(const RenderOptions& options, Production& production) {
     const double fps = options.hasFps ? options.film.fps : s_gifFps;
     const FilmSize& size = production.size();
     const TimeMap& times = production.session().times();
-    Zulm::OutputFile output(options.output, {options.recording, options.edits.file, options.style}, options.force);
+    Zulm::OutputFile output(options.output, inputsOf(options), options.force);
     GifPalette palette(size.width, size.height);
     const int samples = static_cast<int>(std::min<std::int64_t>(s_paletteFrames, times.frames(fps)));
     for (int i = 0; i < samples; ++i)
@@ -123,23 +115,27 @@ ExitCode renderGif(const RenderOptions& options, Production& production) {
 ExitCode renderStills(const RenderOptions& options, Production& production) {
     namespace fs = std::filesystem;
     const TimeMap& times = production.session().times();
+    std::vector<std::string> names;
     std::vector<std::string> paths;
     for (const double time : options.at) {
         if (time > times.duration())
             throw Failure(fmt::format("--at {}: the film ends at {:.3f} s", time, times.duration()));
-        paths.push_back((fs::path(options.frames) / fmt::format("frame-{:09.3f}.png", time)).string());
+        names.push_back(fmt::format("frame-{:09.3f}.png", time));
+        paths.push_back((fs::path(options.frames) / names.back()).string());
     }
     if (std::set<std::string>(paths.begin(), paths.end()).size() < paths.size())
-        throw Failure("--at: two of the times are less than a millisecond apart, and would have one file");
+        throw Failure(
+            "--at: two of the times are less than a millisecond apart, and would have one file; leave one out");
     Zulm::requireFree(paths, options.force);
-    WrittenFiles written(options.frames);
     const Zulm::NotedSignals noted;
-    for (std::size_t i = 0; i < paths.size(); ++i) {
+    NewFiles files(options.frames);
+    Zulm::Progress progress("drawing frames of " + options.recording, names.size(), countText);
+    for (std::size_t i = 0; i < names.size(); ++i) {
         Zulm::NotedSignals::check();
-        writePng(production.composer().frameAt(times.at(options.at[i])), paths[i], options.recording, true);
-        written.add(paths[i]);
+        writePng(production.composer().frameAt(times.at(options.at[i])), files.add(names[i]), inputsOf(options));
+        progress.moveTo(i + 1);
     }
-    written.keep();
+    files.keep();
     return production.complain();
 }
 
@@ -147,12 +143,8 @@ ExitCode renderStills(const RenderOptions& options, Production& production) {
 
 ExitCode render(const RenderOptions& options) {
     Production production(options);
-    if (production.recording().streams().empty()) {
-        Zulm::complain(fmt::format("{}: has no recording metadata, from which a cursor could be drawn; nothing was "
-                                   "written",
-                                   options.recording));
-        return Zulm::ExitNoMetaData;
-    }
+    if (production.recording().streams().empty())
+        return Zulm::complainAboutNoStreams(production.recording());
     const EditList edits = editsFor(options, production);
     production.prepare(edits, options.zoom, options.isGif ? s_gifWidth : 1 << 20);
     if (!options.frames.empty())

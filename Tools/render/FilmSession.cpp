@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <filesystem>
 
 namespace Render {
 
@@ -56,7 +57,8 @@ InsightOptions optionsOf(const Style& style) {
 
 FilmSession::FilmSession(const Recording& recording, const EditList& edits, const Style& style,
                          const PictureSize& movie, const Callback<void(const Error&)>& leaveOut)
-    : style_(style), times_(edits), timeline_(recording, leaveOut) {
+    : style_(style), times_(edits), timeline_(recording, leaveOut),
+      streams_(recording, edits, std::filesystem::temp_directory_path().string()) {
     const auto leaveOutQuietly = [](const Error&) {}; // the timeline has told already
     InsightSources sources = insightSourcesOf(recording, leaveOutQuietly);
     region_ = timeline_.at(0).toPicture(movie).region();
@@ -66,15 +68,15 @@ FilmSession::FilmSession(const Recording& recording, const EditList& edits, cons
     path_ = CursorPath(positions_, clicks_);
     moves_ = movesIn(sources.positions, clicks_);
 
-    edited_ = retimed(recording, edits);
-    sources.positions = trackIn<CursorLocationKind>(edited_, leaveOutQuietly);
-    sources.actions = trackIn<CursorActionKind>(edited_, leaveOutQuietly);
-    sources.keys = trackIn<KeyboardActionKind>(edited_, leaveOutQuietly);
-    sources.scrolling = trackIn<ScrollActionKind>(edited_, leaveOutQuietly);
-    sources.windows = trackIn<TopmostWindowKind>(edited_, leaveOutQuietly);
-    sources.titles = trackIn<TopmostWindowTitleKind>(edited_, leaveOutQuietly);
-    sources.applications = trackIn<TopmostAppNameKind>(edited_, leaveOutQuietly);
-    sources.slides = trackIn<SlideInfoTitleKind>(edited_, leaveOutQuietly);
+    const EditedRecording& edited = streams_.edited();
+    sources.positions = trackIn<CursorLocationKind>(edited, leaveOutQuietly);
+    sources.actions = trackIn<CursorActionKind>(edited, leaveOutQuietly);
+    sources.keys = trackIn<KeyboardActionKind>(edited, leaveOutQuietly);
+    sources.scrolling = trackIn<ScrollActionKind>(edited, leaveOutQuietly);
+    sources.windows = trackIn<TopmostWindowKind>(edited, leaveOutQuietly);
+    sources.titles = trackIn<TopmostWindowTitleKind>(edited, leaveOutQuietly);
+    sources.applications = trackIn<TopmostAppNameKind>(edited, leaveOutQuietly);
+    sources.slides = trackIn<SlideInfoTitleKind>(edited, leaveOutQuietly);
     sources.duration = times_.duration();
     filmInsights_ = insightsOf(sources, optionsOf(style));
     if (!style.zoom.isAutomatic)
@@ -116,15 +118,17 @@ std::optional<CursorState> FilmSession::cursorAt(const FilmTime& now) {
 
 std::vector<ShownClick> FilmSession::clicksAt(const FilmTime& now, double duration) const {
     constexpr std::size_t most = 8;
+    constexpr std::size_t mostLooked = 64; // a button may be held for longer than others take for clicks
     std::vector<ShownClick> shown;
     auto after = std::upper_bound(clicks_.begin(), clicks_.end(), now.source,
                                   [](double time, const Click& click) { return time < click.start; });
-    for (; after != clicks_.begin() && shown.size() < most; --after) {
+    for (std::size_t looked = 0; looked < mostLooked && after != clicks_.begin() && shown.size() < most;
+         --after, ++looked) {
         const Click& click = *(after - 1);
-        const auto age = times_.since(click.start, now);
         const bool isHeld = now.source < click.end;
-        if (now.source - click.start > 60)
-            break;
+        auto age = times_.since(click.start, now);
+        if (!age && isHeld) // a button that was down already at the cut
+            age = times_.sinceCut(now);
         const auto position = positionAt(isHeld ? now.source : click.start);
         if (position && age && (*age < duration || isHeld))
             shown.push_back({*position, *age, isHeld});

@@ -4,9 +4,9 @@
 
 #include "Tools/render/Style.h"
 #include "Tools/render/TimeMap.h"
+#include "Tools/zulm/RetimedStreams.h"
 #include "ZULMetaDataSession/Insights/Insights.h"
 #include "ZULMetaDataSession/Recording.h"
-#include "ZULMetaDataSession/Retiming.h"
 #include "ZULMetaDataSession/Timeline.h"
 
 #include <optional>
@@ -42,7 +42,7 @@ public:
     const TimeMap& times() const { return times_; }
     const ZULMetaData::ScreenRect& region() const { return region_; }           ///< what the movie shows of the display
     const std::vector<ZULMetaData::Click>& clicks() const { return clicks_; }   ///< of the recording
-    const ZULMetaData::EditedRecording& edited() const { return edited_; }      ///< the streams of the film
+    Zulm::RetimedStreams& streams() { return streams_; }                        ///< of the film
     const ZULMetaData::Insights& filmInsights() const { return filmInsights_; } ///< of the edited movie
 
     /// Takes these zooms, at times of the film, in place of the automatic ones.
@@ -67,7 +67,7 @@ private:
     ZULMetaData::Track<ZULMetaData::CursorLocationKind> positions_;
     ZULMetaData::CursorPath path_;
     std::vector<double> moves_; ///< when the cursor moved or a button was pressed
-    ZULMetaData::EditedRecording edited_;
+    Zulm::RetimedStreams streams_;
     ZULMetaData::Insights filmInsights_;
 };
 

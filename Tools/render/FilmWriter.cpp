@@ -1,5 +1,6 @@
 #include "Tools/render/FilmWriter.h"
 
+#include "Tools/zulm/Command.h"
 #include "Tools/zulm/Failure.h"
 
 #include <fmt/core.h>
@@ -118,15 +119,28 @@ void FilmWriter::openPictures(int width, int height, ColourMatrix matrix) {
     if (output_->format->oformat->flags & AVFMT_GLOBALHEADER)
         encoder.flags |= AV_CODEC_FLAG_GLOBAL_HEADER;
     encoder.thread_count = 0;
-    // Encoders without these options do not know them, which is no error.
-    av_opt_set(encoder.priv_data, "preset", "veryfast", 0);
-    av_opt_set(encoder.priv_data, "crf", std::to_string(settings_.quality).c_str(), 0);
+    av_opt_set(encoder.priv_data, "preset", "veryfast", 0); // not all have it
+    setQuality(encoder);
     if (const int error = avcodec_open2(&encoder, codec, nullptr); error < 0)
         fail("the encoder of pictures cannot be started", error);
     output_->pictureStream = avformat_new_stream(output_->format, codec);
     output_->pictureStream->time_base = encoder.time_base;
     output_->pictureStream->avg_frame_rate = encoder.framerate;
     avcodec_parameters_from_context(output_->pictureStream->codecpar, &encoder);
+}
+
+void FilmWriter::setQuality(AVCodecContext& encoder) const {
+    encoder.bit_rate = 0;
+    if (av_opt_set(encoder.priv_data, "crf", std::to_string(settings_.quality).c_str(), 0) >= 0)
+        return;
+    constexpr int worst = 51;
+    constexpr int steps = 30; // other encoders count from 1 to 31
+    encoder.flags |= AV_CODEC_FLAG_QSCALE;
+    encoder.global_quality = FF_QP2LAMBDA * (1 + settings_.quality * steps / worst);
+    if (settings_.isQualityAsked)
+        Zulm::warn(
+            fmt::format("--quality: the encoder {} has no constant rate factor; its own scale of quality is used",
+                        settings_.codec));
 }
 
 void FilmWriter::openSound() {

@@ -14,7 +14,8 @@ struct FilmSettings {
     double fps = 30;
     std::string codec = "h264"; ///< of libavcodec
     int quality = 20;           ///< constant rate factor: lower is better
-    int soundRate = 0;          ///< 0 if there is no sound
+    bool isQualityAsked = false;
+    int soundRate = 0; ///< 0 if there is no sound
 };
 
 class FilmWriter {
@@ -37,6 +38,7 @@ private:
     struct Output;
 
     void openPictures(int width, int height, ColourMatrix matrix);
+    void setQuality(AVCodecContext& encoder) const;
     void openSound();
     void encode(AVCodecContext& encoder, AVStream& stream, const AVFrame* frame);
     [[noreturn]] void fail(const char* what, int error) const;

@@ -51,7 +51,8 @@ public:
         avfilter_inout_free(&inputs);
         avfilter_inout_free(&outputs);
         if (!isFine)
-            throw Failure("libavfilter cannot make a palette; it lacks palettegen or paletteuse");
+            throw Failure("libavfilter cannot make a palette, because it lacks palettegen or paletteuse; render an MP4 "
+                          "movie instead");
     }
 
     AVFilterContext* filter(const char* name) const { return avfilter_graph_get_filter(graph_.get(), name); }
@@ -63,7 +64,8 @@ private:
 /// Hands a frame to an input of a graph; null ends the input.
 void feed(AVFilterContext* input, AVFrame* frame) {
     if (const int error = av_buffersrc_add_frame(input, frame); error < 0)
-        throw Failure("the colours of the film cannot be reduced: " + textOf(error));
+        throw Failure(
+            fmt::format("the colours of the film cannot be reduced: {}; render an MP4 movie instead", textOf(error)));
 }
 
 std::string bufferFilter(const char* name, int width, int height) {
@@ -95,7 +97,7 @@ FramePointer GifPalette::take() {
     feed(graph_->filter("buffer@in"), nullptr);
     FramePointer palette = newFrame();
     if (const int error = av_buffersink_get_frame(graph_->filter("buffersink@out"), palette.get()); error < 0)
-        throw Failure("libavfilter has made no palette: " + textOf(error));
+        throw Failure(fmt::format("libavfilter has made no palette: {}; render an MP4 movie instead", textOf(error)));
     return palette;
 }
 
@@ -131,7 +133,7 @@ GifWriter::GifWriter(const std::string& path, std::string name, int width, int h
     feed(output_->graph.filter("buffer@colours"), nullptr);
     const AVCodec* codec = avcodec_find_encoder(AV_CODEC_ID_GIF);
     if (!codec || avformat_alloc_output_context2(&output_->format, nullptr, "gif", nullptr) < 0)
-        throw Failure("libavcodec has no encoder for GIF");
+        throw Failure("libavcodec has no encoder for GIF; render an MP4 movie instead");
     output_->encoder.reset(avcodec_alloc_context3(codec));
     AVCodecContext& encoder = *output_->encoder;
     encoder.width = width;

@@ -1,5 +1,6 @@
 #include "Tools/render/Guide.h"
 
+#include "Reports/Text.h"
 #include "Tools/render/KeyCaps.h"
 #include "Tools/render/Production.h"
 #include "Tools/render/Stills.h"
@@ -25,6 +26,8 @@ namespace {
 namespace fs = std::filesystem;
 
 constexpr std::size_t s_longestTitle = 120; ///< bytes
+constexpr auto s_htmlName = "guide.html";
+constexpr auto s_markdownName = "guide.md";
 
 std::string signOf(Modifier modifier) {
     switch (modifier) {
@@ -86,8 +89,8 @@ std::string shortened(std::string text) {
 
 std::string whereAt(Timeline& timeline, double time) {
     const Snapshot& state = timeline.at(time);
-    const std::string title = shortened(std::string(state.title.value_or("")));
-    const std::string application = shortened(std::string(state.application.value_or("")));
+    const std::string title = shortened(Zulm::readableLine(std::string(state.title.value_or(""))));
+    const std::string application = shortened(Zulm::readableLine(std::string(state.application.value_or(""))));
     if (title.empty() || application.empty() || title.find(application) != std::string::npos)
         return title.empty() ? application : title;
     return fmt::format("{} ({})", title, application);
@@ -199,36 +202,37 @@ std::vector<GuideStep> stepsOf(const Recording& recording, double duration, bool
 
 Zulm::ExitCode makeGuide(const GuideOptions& options) {
     Production production(options);
+    if (production.recording().streams().empty())
+        return Zulm::complainAboutNoStreams(production.recording());
     production.prepare(production.whole(), "off", 1 << 20);
     const bool showsTyped = production.style().keys.display == KeyDisplay::Shown;
     const std::vector<GuideStep> steps = stepsOf(production.shown(), production.duration(), showsTyped);
     if (steps.empty())
         throw Zulm::Failure(
-            fmt::format("{}: has neither clicks nor keys, of which a guide could tell", options.recording));
+            fmt::format("{}: has neither clicks nor keys, of which a guide could tell; is it the right recording?",
+                        options.recording));
     const fs::path folder(options.folder);
-    std::vector<std::string> paths{(folder / "guide.html").string(), (folder / "guide.md").string()};
+    std::vector<std::string> paths{(folder / s_htmlName).string(), (folder / s_markdownName).string()};
     for (std::size_t i = 0; i < steps.size(); ++i)
         paths.push_back((folder / pictureName(i)).string());
     Zulm::requireFree(paths, options.force);
-    WrittenFiles written(options.folder);
     const Zulm::NotedSignals noted;
-    Zulm::Progress progress("drawing the steps of " + options.recording, steps.size(),
-                            [](std::uint64_t count) { return fmt::format("{}", count); });
+    NewFiles files(options.folder);
+    Zulm::Progress progress("drawing the steps of " + options.recording, steps.size(), countText);
     for (std::size_t i = 0; i < steps.size(); ++i) {
         Zulm::NotedSignals::check();
         const FilmTime time = production.session().times().at(steps[i].time);
-        writePng(production.composer().stillAt(time), paths[i + 2], options.recording, true);
-        written.add(paths[i + 2]);
+        writePng(production.composer().stillAt(time), files.add(pictureName(i)), inputsOf(options));
         progress.moveTo(i + 1);
     }
     const std::string title = fs::path(options.recording).stem().string();
-    Zulm::writeWholeFile(paths[0], htmlOf(steps, title), {options.recording}, true);
-    written.add(paths[0]);
-    Zulm::writeWholeFile(paths[1], markdownOf(steps, title), {options.recording}, true);
-    written.keep();
+    Zulm::writeWholeFile(files.add(s_htmlName), htmlOf(steps, title), inputsOf(options), false);
+    Zulm::writeWholeFile(files.add(s_markdownName), markdownOf(steps, title), inputsOf(options), false);
+    files.keep();
     removeOlderPictures(folder, steps.size());
     if (!Zulm::settings().quiet)
-        Zulm::writeOutput(fmt::format("{}: {} step{}\n", options.folder, steps.size(), steps.size() == 1 ? "" : "s"));
+        Zulm::writeOutput(
+            fmt::format("{}: {} step{}\n", Zulm::shown(options.folder), steps.size(), steps.size() == 1 ? "" : "s"));
     return production.complain();
 }
 

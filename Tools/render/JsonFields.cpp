@@ -67,42 +67,37 @@ public:
 
     std::map<std::string, JsonField> values;
 
-    bool null() override { return add(nullptr); }
-    bool boolean(bool value) override { return add(value); }
-    bool number_integer(number_integer_t value) override { return add(value); }
-    bool number_unsigned(number_unsigned_t value) override { return add(value); }
-    bool number_float(number_float_t value, const string_t&) override { return add(value); }
-    bool string(string_t& value) override { return add(value); }
+    bool null() override { return add(nullptr) != nullptr; }
+    bool boolean(bool value) override { return add(value) != nullptr; }
+    bool number_integer(number_integer_t value) override { return add(value) != nullptr; }
+    bool number_unsigned(number_unsigned_t value) override { return add(value) != nullptr; }
+    bool number_float(number_float_t value, const string_t&) override { return add(value) != nullptr; }
+    bool string(string_t& value) override { return add(value) != nullptr; }
     bool binary(binary_t&) override { return false; }
     bool start_object(std::size_t) override {
-        add(nullptr).isObject = true;
+        add(nullptr)->isObject = true;
         return open();
     }
     bool end_object() override { return close(); }
     bool start_array(std::size_t) override {
-        add(nullptr).isArray = true;
+        add(nullptr)->isArray = true;
         return open();
     }
     bool end_array() override { return close(); }
     bool key(string_t& name) override {
+        if (name.find_first_of(".[]") != string_t::npos) // would pass for the path of another member
+            throw Failure(fmt::format("{}: line {}: \"{}\" is not known", file_, line_, name));
         key_ = name;
         return true;
     }
     bool parse_error(std::size_t, const std::string&, const nlohmann::detail::exception& error) override {
         std::string sentence = error.what();
         sentence = sentence.substr(sentence.rfind("; ") == std::string::npos ? 0 : sentence.rfind("; ") + 2);
-        throw Failure(fmt::format("{}: line {}: no JSON document: {}", file_, line_, sentence));
+        throw Failure(fmt::format("{}: line {}: is not a JSON document: {}", file_, line_, sentence));
     }
 
 private:
-    struct Added {
-        JsonField* value;
-        bool& isObject = value->isObject;
-        bool& isArray = value->isArray;
-        operator bool() const { return true; }
-    };
-
-    Added add(nlohmann::json value) {
+    JsonField* add(nlohmann::json value) {
         if (values.size() >= s_mostValues || levels_.size() > s_mostLevels)
             throw Failure(fmt::format("{}: line {}: too long or too deep", file_, line_));
         const std::string path = levels_.empty()          ? std::string()
@@ -113,11 +108,11 @@ private:
         const std::string place = isInArray ? fmt::format("{}[{}]", levels_.back(), parent->items++) : path;
         const auto [found, isNew] = values.try_emplace(place);
         if (!isNew)
-            throw Failure(fmt::format("{}: line {}: \"{}\" stands there twice", file_, line_, place));
+            throw Failure(fmt::format("{}: line {}: \"{}\" is given twice", file_, line_, place));
         found->second.value = std::move(value);
         found->second.line = line_;
         last_ = place;
-        return {&found->second};
+        return &found->second;
     }
 
     bool open() {
@@ -154,15 +149,14 @@ JsonFields::JsonFields(std::string_view document, std::string file, const std::s
     JsonField& whole = fields_.at("");
     whole.isUsed = true;
     std::string name;
-    double version = 0;
     if (!whole.isObject)
-        fail(1, "not an object");
+        fail(1, "is not an object");
     text("schema", name);
     if (name != schema)
         fail(has("schema") ? fields_.at("schema").line : 1, fmt::format("\"schema\" must be \"{}\"", schema));
-    number("schema_version", 1, 1, version);
-    if (version != 1)
-        fail(1, "\"schema_version\" must be 1");
+    const JsonField* version = take("schema_version");
+    if (!version || !version->value.is_number() || version->value.get<double>() != 1)
+        fail(version ? version->line : 1, "\"schema_version\" must be 1; a newer version of zulm may read others");
 }
 
 bool JsonFields::number(const std::string& path, double least, double most, double& result) {

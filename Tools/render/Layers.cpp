@@ -15,9 +15,9 @@ using namespace ZULMetaData;
 
 namespace {
 
-constexpr std::uint32_t s_largestCursor = 1024; ///< pixels a side; a larger picture is no cursor
-constexpr std::size_t s_mostBitmaps = 256;      ///< that are kept
-constexpr double s_farAway = 1e6;               ///< pixels; what is farther is not drawn
+constexpr std::uint32_t s_largestCursor = 1024;                  ///< pixels a side; a larger picture is no cursor
+constexpr std::size_t s_mostBitmapBytes = std::size_t{64} << 20; ///< that are kept
+constexpr double s_farAway = 1e6;                                ///< pixels; what is farther is not drawn
 
 /// The tip is the hot spot. Stands for a cursor whose picture is not known.
 constexpr std::array<std::pair<double, double>, 7> s_arrow{
@@ -55,24 +55,94 @@ void drawArrow(const Canvas& canvas, const ScreenPoint& tip, const ScreenPoint& 
     cairo_stroke(context);
 }
 
+using LayoutPointer = std::unique_ptr<PangoLayout, CairoReleaser<g_object_unref>>;
+using FontPointer = std::unique_ptr<PangoFontDescription, CairoReleaser<pango_font_description_free>>;
+
 /// A part of a caption, measured.
 struct LaidText {
-    std::unique_ptr<PangoLayout, CairoReleaser<g_object_unref>> layout;
+    LayoutPointer layout;
     double width = 0;
     double height = 0;
     bool isTyped = false;
 };
+
+/// The parts of a caption for which there is room.
+struct LaidCaption {
+    std::vector<LaidText> texts;
+    double width = 0;
+    double height = 0;
+};
+
+/// Lengths of captions, in heights of their letters.
+///@{
+constexpr double s_gap = 0.35;    ///< between two parts
+constexpr double s_inset = 0.4;   ///< from the edge of a key to its sign
+constexpr double s_border = 0.12; ///< between a sign and the upper edge of its key
+///@}
+
+/// Measures a caption whose letters are `size` pixels high. The last keys are shown if all are wider than `most`
+/// pixels.
+LaidCaption laidOut(const std::vector<CaptionPart>& parts, const Style::Keys& style, double size, double most) {
+    const SurfacePointer surface(cairo_image_surface_create(CAIRO_FORMAT_ARGB32, 1, 1));
+    const ContextPointer context(cairo_create(surface.get()));
+    const FontPointer font(pango_font_description_from_string(style.font.c_str()));
+    pango_font_description_set_absolute_size(font.get(), size * PANGO_SCALE);
+    pango_font_description_set_weight(font.get(), PANGO_WEIGHT_SEMIBOLD);
+    LaidCaption caption;
+    for (const CaptionPart& part : parts) {
+        LaidText text{LayoutPointer(pango_cairo_create_layout(context.get())), 0, 0, part.isTyped};
+        PangoLayout* layout = text.layout.get();
+        pango_layout_set_font_description(layout, font.get());
+        pango_layout_set_text(layout, part.text.c_str(), static_cast<int>(part.text.size()));
+        pango_layout_set_single_paragraph_mode(layout, 1);
+        pango_layout_set_width(layout, static_cast<int>(most * 0.9) * PANGO_SCALE);
+        pango_layout_set_ellipsize(layout, PANGO_ELLIPSIZE_START);
+        PangoRectangle area;
+        pango_layout_get_pixel_extents(layout, nullptr, &area);
+        text.width = area.width + (part.isTyped ? 0 : 2 * s_inset * size);
+        text.height = area.height;
+        caption.width += text.width + (caption.texts.empty() ? 0 : s_gap * size);
+        caption.height = std::max(caption.height, text.height);
+        caption.texts.push_back(std::move(text));
+    }
+    while (caption.width > most && caption.texts.size() > 1) {
+        caption.width -= caption.texts.front().width + s_gap * size;
+        caption.texts.erase(caption.texts.begin());
+    }
+    return caption;
+}
+
+/// Draws a part of a caption with its upper left corner at `place`: a key on a tile, and typed text without one.
+void drawText(const Canvas& canvas, const LaidText& text, const Style::Keys& style, const ScreenPoint& place,
+              double size) {
+    cairo_t* context = canvas.context();
+    if (!text.isTyped) {
+        canvas.setColour(style.colour, 0.16);
+        canvas.addRoundedRect(place.x, place.y - size * s_border, text.width, text.height + 2 * size * s_border,
+                              size * 0.25);
+        cairo_fill(context);
+    }
+    canvas.setColour(style.colour);
+    cairo_move_to(context, place.x + (text.isTyped ? 0 : s_inset * size), place.y);
+    pango_cairo_update_layout(context, text.layout.get());
+    pango_cairo_show_layout(context, text.layout.get());
+}
 
 } // namespace
 
 CursorLayer::Bitmap& CursorLayer::bitmapOf(const CursorPicture& picture) {
     if (const auto found = bitmaps_.find(&picture); found != bitmaps_.end())
         return found->second;
-    if (bitmaps_.size() >= s_mostBitmaps)
-        bitmaps_.clear();
-    Bitmap& bitmap = bitmaps_[&picture];
     const auto info = Image::infoOfEncodedBytes(picture.bytes);
-    if (!info || info->width > s_largestCursor || info->height > s_largestCursor)
+    const bool isUsable = info && info->width <= s_largestCursor && info->height <= s_largestCursor;
+    const std::size_t bytes = sizeof(Bitmap) + (isUsable ? std::size_t{4} * info->width * info->height : 0);
+    if (bitmapBytes_ + bytes > s_mostBitmapBytes) {
+        bitmaps_.clear();
+        bitmapBytes_ = 0;
+    }
+    bitmapBytes_ += bytes;
+    Bitmap& bitmap = bitmaps_[&picture];
+    if (!isUsable)
         return bitmap;
     const auto image = Image::fromEncodedBytes(picture.bytes);
     if (!image || image->width() == 0 || image->height() == 0)
@@ -161,60 +231,20 @@ void CaptionLayer::draw(const KeyCaption* caption, double film, const Stage& sta
 
 Tile CaptionLayer::made(const Stage& stage) const {
     const double size = stage.points(style_.size);
-    SurfacePointer measure(cairo_image_surface_create(CAIRO_FORMAT_ARGB32, 1, 1));
-    const ContextPointer measuring(cairo_create(measure.get()));
-    PangoFontDescription* font = pango_font_description_from_string(style_.font.c_str());
-    pango_font_description_set_absolute_size(font, size * PANGO_SCALE);
-    pango_font_description_set_weight(font, PANGO_WEIGHT_SEMIBOLD);
-    std::vector<LaidText> texts;
-    double width = 0;
-    double height = 0;
-    const double most = stage.film().width * 0.9;
-    const double gap = size * 0.35;
-    const double inset = size * 0.4; // of a key's sign
-    for (const CaptionPart& part : shown_) {
-        LaidText text{decltype(LaidText::layout)(pango_cairo_create_layout(measuring.get())), 0, 0, part.isTyped};
-        pango_layout_set_font_description(text.layout.get(), font);
-        pango_layout_set_text(text.layout.get(), part.text.c_str(), static_cast<int>(part.text.size()));
-        pango_layout_set_single_paragraph_mode(text.layout.get(), 1);
-        pango_layout_set_width(text.layout.get(), static_cast<int>(most * 0.9) * PANGO_SCALE);
-        pango_layout_set_ellipsize(text.layout.get(), PANGO_ELLIPSIZE_START);
-        PangoRectangle area;
-        pango_layout_get_pixel_extents(text.layout.get(), nullptr, &area);
-        text.width = area.width + (part.isTyped ? 0 : 2 * inset);
-        text.height = area.height;
-        width += text.width + (texts.empty() ? 0 : gap);
-        height = std::max(height, text.height);
-        texts.push_back(std::move(text));
-    }
-    pango_font_description_free(font);
-    std::size_t first = 0; // the last keys are shown if there is no room for all
-    for (; width > most && first + 1 < texts.size(); ++first)
-        width -= texts[first].width + gap;
-    const double boxWidth = width + 1.6 * size;
-    const double boxHeight = height + 1.2 * size;
+    const LaidCaption caption = laidOut(shown_, style_, size, stage.film().width * 0.9);
+    const double boxWidth = caption.width + 1.6 * size;
+    const double boxHeight = caption.height + 1.2 * size;
     const double left = (stage.film().width - boxWidth) / 2;
     const double top = stage.film().height - boxHeight - stage.points(70);
     Tile tile(coverOf(left, top, left + boxWidth, top + boxHeight, stage));
     const Canvas canvas(tile);
-    cairo_t* context = canvas.context();
     canvas.setColour(style_.background);
     canvas.addRoundedRect(left, top, boxWidth, boxHeight, size * 0.6);
-    cairo_fill(context);
+    cairo_fill(canvas.context());
     double x = left + 0.8 * size;
-    for (std::size_t i = first; i < texts.size(); ++i) {
-        const LaidText& text = texts[i];
-        const double y = top + (boxHeight - text.height) / 2;
-        if (!text.isTyped) {
-            canvas.setColour(style_.colour, 0.16);
-            canvas.addRoundedRect(x, y - size * 0.12, text.width, text.height + size * 0.24, size * 0.25);
-            cairo_fill(context);
-        }
-        canvas.setColour(style_.colour);
-        cairo_move_to(context, x + (text.isTyped ? 0 : inset), y);
-        pango_cairo_update_layout(context, text.layout.get());
-        pango_cairo_show_layout(context, text.layout.get());
-        x += text.width + gap;
+    for (const LaidText& text : caption.texts) {
+        drawText(canvas, text, style_, {x, top + (boxHeight - text.height) / 2}, size);
+        x += text.width + size * s_gap;
     }
     return tile;
 }

@@ -31,6 +31,7 @@ private:
 
     Style::Cursor style_;
     std::map<const ZULMetaData::CursorPicture*, Bitmap> bitmaps_;
+    std::size_t bitmapBytes_ = 0; ///< of all of them
 };
 
 /// Draws a ring that grows for every click.

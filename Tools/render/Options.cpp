@@ -7,13 +7,15 @@
 #include <fmt/ranges.h>
 
 #include <algorithm>
-#include <cstdio>
+#include <charconv>
+#include <system_error>
 
 namespace Render {
 
 namespace {
 
 constexpr int s_largestSide = 8192;
+constexpr double s_mostGifFps = 50; ///< players show faster ones slower
 
 constexpr auto s_renderFooter =
     R"(Cursor, clicks, keys and zooms are drawn from the metadata of the recording, which the film carries too.
@@ -25,9 +27,11 @@ constexpr auto s_renderFooter =
 
 FilmSize sizeOf(const std::string& text) {
     FilmSize size;
-    int read = 0;
-    const int count = std::sscanf(text.c_str(), "%5dx%5d%n", &size.width, &size.height, &read);
-    const bool isFine = count == 2 && static_cast<std::size_t>(read) == text.size() &&
+    const char* end = text.data() + text.size();
+    const auto width = std::from_chars(text.data(), end, size.width);
+    const bool hasHeight = width.ec == std::errc() && width.ptr != end && *width.ptr == 'x';
+    const auto height = hasHeight ? std::from_chars(width.ptr + 1, end, size.height) : width;
+    const bool isFine = hasHeight && height.ec == std::errc() && height.ptr == end &&
                         std::min(size.width, size.height) >= 16 && std::max(size.width, size.height) <= s_largestSide &&
                         size.width % 2 == 0 && size.height % 2 == 0;
     if (!isFine)
@@ -37,10 +41,20 @@ FilmSize sizeOf(const std::string& text) {
     return size;
 }
 
+/// Takes finite numbers alone; `CLI::Range` takes "nan" too.
+CLI::Validator numberFrom(double least, double most) {
+    return {[least, most](const std::string& text) {
+                double number = 0;
+                const bool isFine = CLI::detail::lexical_cast(text, number) && number >= least && number <= most;
+                return isFine ? std::string() : fmt::format("{} is not a number from {} to {}", text, least, most);
+            },
+            fmt::format("{} to {}", least, most)};
+}
+
 void addSourceOptions(CLI::App& app, SourceOptions& options) {
     app.add_option("RECORDING", options.recording, "The recording; - is standard input")->required();
     app.add_option("--style", options.style,
-                   fmt::format("A JSON file, or one of these: {}", fmt::join(installedStyles(), ", ")))
+                   fmt::format("A JSON file, or one of these: {}", fmt::join(shippedStyles(), ", ")))
         ->type_name("STYLE");
     app.add_option("--redact", options.redactions,
                    "Cover the rectangles of this JSON file in the picture, and remove what lies there from the streams")
@@ -48,10 +62,10 @@ void addSourceOptions(CLI::App& app, SourceOptions& options) {
     app.add_option("--keys", options.keys, "Which keys are shown: shown, shortcuts or hidden")
         ->check(CLI::IsMember({"shown", "shortcuts", "hidden"}));
     app.add_option("--cursor-size", options.cursorSize, "How many times larger the cursor is drawn")
-        ->check(CLI::Range(0.25, 10.0));
+        ->check(numberFrom(0.25, 10));
     app.add_flag("--raw-cursor", options.isRaw, "Move the cursor as it was recorded, and do not smooth its way");
     app.add_option("--hide-cursor", options.hideAfter, "Hide a cursor that rests for so many seconds")
-        ->check(CLI::Range(0.1, 3600.0));
+        ->check(numberFrom(0.1, 3600));
     app.add_option_function<std::string>(
            "--size", [&options](const std::string& text) { options.size = sizeOf(text); },
            "The size in pixels; that of the movie by default")
@@ -77,7 +91,7 @@ bool parse(CLI::App& app, std::vector<std::string> words) {
 
 void requireSense(const RenderOptions& options) {
     const int edits = (options.edits.file.empty() ? 0 : 1) + (options.edits.kept.empty() ? 0 : 1) +
-                      (options.edits.removed.empty() ? 0 : 1) + (options.idle ? 1 : 0);
+                      (options.edits.removed.empty() ? 0 : 1) + (options.removesIdle ? 1 : 0);
     if (edits > 1)
         throw CLI::ValidationError("--edits, --keep, --remove and --remove-idle cannot be given together");
     if (options.frames.empty() != options.at.empty())
@@ -86,12 +100,33 @@ void requireSense(const RenderOptions& options) {
         throw CLI::ValidationError("give either -o OUT or --frames DIR");
     if (options.isGif && !options.frames.empty())
         throw CLI::ValidationError("--gif and --frames cannot be given together");
+    if (options.isGif && options.film.fps > s_mostGifFps)
+        throw CLI::ValidationError(
+            fmt::format("--fps {}: a GIF has at most {} frames a second", options.film.fps, s_mostGifFps));
     const std::string extension = options.isGif ? ".gif" : ".mp4";
     if (options.frames.empty() && !options.output.ends_with(extension))
         throw CLI::ValidationError(fmt::format("{}: the name of the film must end in {}", options.output, extension));
 }
 
 } // namespace
+
+std::vector<std::string> inputsOf(const SourceOptions& options) {
+    std::vector<std::string> files{options.recording};
+    if (!isShippedStyle(options.style))
+        files.push_back(options.style);
+    if (!options.redactions.empty())
+        files.push_back(options.redactions);
+    if (!options.zoom.empty() && options.zoom != "auto" && options.zoom != "off")
+        files.push_back(options.zoom);
+    return files;
+}
+
+std::vector<std::string> inputsOf(const RenderOptions& options) {
+    std::vector<std::string> files = inputsOf(static_cast<const SourceOptions&>(options));
+    if (!options.edits.file.empty())
+        files.push_back(options.edits.file);
+    return files;
+}
 
 std::optional<RenderOptions> renderOptionsOf(std::vector<std::string> words) {
     RenderOptions options;
@@ -100,29 +135,30 @@ std::optional<RenderOptions> renderOptionsOf(std::vector<std::string> words) {
     addSourceOptions(app, options);
     app.add_option("-o,--output", options.output, "The film to make")->type_name("OUT");
     Zulm::addEditOptions(app, options.edits);
-    app.add_option("--remove-idle", options.idle,
-                   "Cut spans without activity that are at least so many seconds long, 5 by default, to a rest")
-        ->expected(0, 1)
-        ->default_str("5")
-        ->check(CLI::Range(0.1, 1e6));
-    app.add_option("--idle-rest", options.rest, "How many seconds are left of such a span, 1 by default")
-        ->check(CLI::Range(0.0, 1e6));
+    CLI::Option* idle = app.add_flag("--remove-idle", options.removesIdle, "Cut long spans without activity to a rest");
+    app.add_option("--idle-least", options.idleLeast, "How many seconds such a span has at least, 5 by default")
+        ->check(numberFrom(0.1, 1e6))
+        ->needs(idle);
+    app.add_option("--idle-rest", options.idleRest, "How many seconds are left of such a span, 1 by default")
+        ->check(numberFrom(0, 1e6))
+        ->needs(idle);
     app.add_option("--zoom", options.zoom, "auto, off, or a JSON file of zooms")->type_name("auto|off|FILE");
     CLI::Option* fps = app.add_option("--fps", options.film.fps, "Frames a second, 30 by default and 12 for --gif")
-                           ->check(CLI::Range(1.0, 120.0));
+                           ->check(numberFrom(1, 120));
     app.add_option("--codec", options.film.codec, "An encoder of libavcodec, h264 by default");
-    app.add_option("--quality", options.film.quality, "From 0, the best, to 51; 20 by default")
-        ->check(CLI::Range(0, 51));
+    CLI::Option* quality = app.add_option("--quality", options.film.quality, "From 0, the best, to 51; 20 by default")
+                               ->check(CLI::Range(0, 51));
     app.add_flag("--no-sound", options.isSilent, "Leave the sound out");
     app.add_flag("--gif", options.isGif, "Make an animated GIF");
     app.add_option("--frames", options.frames, "Write single frames as PNG files into this folder")->type_name("DIR");
     app.add_option("--at", options.at, "The times of these frames in seconds of the film")
         ->type_name("T,T")
         ->delimiter(',')
-        ->check(CLI::Range(0.0, 1e7));
+        ->check(numberFrom(0, 1e7));
     if (!parse(app, std::move(words)))
         return std::nullopt;
     options.hasFps = fps->count() > 0;
+    options.film.isQualityAsked = quality->count() > 0;
     requireSense(options);
     return options;
 }

@@ -29,8 +29,9 @@ struct SourceOptions {
 struct RenderOptions : SourceOptions {
     std::string output;
     Zulm::EditOptions edits;
-    std::optional<double> idle; ///< seconds without activity that are cut
-    double rest = 1;            ///< seconds that are left of them
+    bool removesIdle = false;
+    double idleLeast = 5; ///< seconds without activity that are cut
+    double idleRest = 1;  ///< seconds that are left of them
     FilmSettings film;
     bool hasFps = false;
     bool isSilent = false;
@@ -38,6 +39,12 @@ struct RenderOptions : SourceOptions {
     std::string frames;     ///< a folder, or empty
     std::vector<double> at; ///< the times of the film of the frames
 };
+
+/// Returns the files that a command reads, as they were named.
+///@{
+std::vector<std::string> inputsOf(const SourceOptions& options);
+std::vector<std::string> inputsOf(const RenderOptions& options);
+///@}
 
 struct GuideOptions : SourceOptions {
     std::string folder;

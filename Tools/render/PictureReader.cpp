@@ -24,6 +24,9 @@ constexpr double s_rounding = 0.0005;
 /// A time that is farther ahead is looked for by a seek, in seconds.
 constexpr double s_farAhead = 4;
 
+/// A picture that begins later is damage, in seconds.
+constexpr double s_latest = 1e7;
+
 /// Returns what the numbers of a frame mean, as players guess it if the frame does not say it.
 ColourMatrix matrixOf(const AVFrame& frame) {
     switch (frame.colorspace) {
@@ -87,9 +90,8 @@ std::optional<double> PictureReader::duration() const {
 
 double PictureReader::secondsOf(const AVFrame& frame) const {
     const std::int64_t time = frame.best_effort_timestamp != AV_NOPTS_VALUE ? frame.best_effort_timestamp : frame.pts;
-    if (time == AV_NOPTS_VALUE)
-        return lastTime_;
-    return static_cast<double>(time) * av_q2d(movie_.input->streams[stream_]->time_base);
+    const double seconds = static_cast<double>(time) * av_q2d(movie_.input->streams[stream_]->time_base);
+    return time == AV_NOPTS_VALUE || std::abs(seconds) > s_latest ? lastTime_ : seconds;
 }
 
 bool PictureReader::send() {
@@ -129,8 +131,11 @@ std::optional<PictureReader::Decoded> PictureReader::next() {
 void PictureReader::seek(double time) {
     const AVStream& stream = *movie_.input->streams[stream_];
     const auto target = static_cast<std::int64_t>(std::floor(time / av_q2d(stream.time_base)));
-    if (av_seek_frame(movie_.input.get(), stream_, target, AVSEEK_FLAG_BACKWARD) < 0)
-        av_seek_frame(movie_.input.get(), stream_, 0, AVSEEK_FLAG_BACKWARD);
+    if (av_seek_frame(movie_.input.get(), stream_, target, AVSEEK_FLAG_BACKWARD) < 0 &&
+        av_seek_frame(movie_.input.get(), stream_, 0, AVSEEK_FLAG_BACKWARD) < 0) {
+        cannotSeek_ = true;
+        return;
+    }
     avcodec_flush_buffers(decoder_.get());
     current_.reset();
     following_.reset();
@@ -173,16 +178,20 @@ const YuvPicture& PictureReader::at(double time) {
     if (isEarlier || isFar)
         seek(time);
     advance(time);
-    for (double earlier = 1; current_ && current_->time > time + s_rounding && time > 0 && earlier < 1e6;
-         earlier *= 8) {
+    for (double earlier = 1;
+         !cannotSeek_ && current_ && current_->time > time + s_rounding && time > 0 && earlier < 1e6; earlier *= 8) {
         const double found = current_->time; // some containers seek to a place after the time
         seek(std::max(0.0, time - earlier));
         advance(time);
         if (time - earlier <= 0 || !current_ || current_->time > found)
             break;
     }
-    if (!current_)
-        throw Failure(fmt::format("{}: none of its pictures can be decoded", movie_.name));
+    if (!current_ && number_ == 0)
+        throw Failure(fmt::format("{}: none of its pictures can be decoded; does a player show it?", movie_.name));
+    if (!current_) { // the rest is damaged, and the last picture stays
+        endedEarly_ = true;
+        return picture_;
+    }
     if (!isPrepared_) {
         picture_ = prepared(*current_->frame);
         isPrepared_ = true;

@@ -33,6 +33,9 @@ public:
     /// Returns whether a picture after the last one was asked for although the stream should go on, or reading failed.
     bool endedEarly() const { return endedEarly_; }
 
+    /// Returns whether the movie could not be sought in. What is earlier then shows a later picture.
+    bool cannotSeek() const { return cannotSeek_; }
+
     int width() const { return width_; }   ///< of its pictures, which stand upright
     int height() const { return height_; } ///< the same
 
@@ -69,6 +72,7 @@ private:
     bool isFlushing_ = false;
     bool isUnreadable_ = false; ///< reading ended by an error
     bool endedEarly_ = false;
+    bool cannotSeek_ = false;
     double packetsEnd_ = 0; ///< when the last packet ends that was read, in seconds
     double lastTime_ = 0;
     YuvPicture picture_;

@@ -4,11 +4,14 @@
 #include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/TemporaryFile.h"
 #include "ZULMetaData/ZULMMetaDataWriter.h"
+#include "ZULMetaDataBridge/Source/FileError.h"
 #include "ZULMetaDataBridge/Source/SafeMovieSave.h"
 
 #include <fmt/core.h>
 
 #include <algorithm>
+#include <array>
+#include <bit>
 #include <cmath>
 #include <filesystem>
 #include <fstream>
@@ -22,6 +25,20 @@ using Zulm::Failure;
 namespace {
 
 constexpr double s_largestSide = 4096; ///< of a film whose size nobody asked for
+constexpr int s_regionVersion = 1;
+constexpr double s_longest = 1e7; ///< seconds of a recording, and of a film
+
+/// Throws `Failure` if a film has no frame, or more of them than anybody can have recorded.
+void requireLength(const EditList& edits, const std::string& recording) {
+    if (edits.pieces().empty())
+        throw Failure(fmt::format("{}: nothing of it is kept, and a film without a frame cannot be made", recording));
+    const bool isFine = edits.duration().nearest() <= s_longest &&
+                        std::all_of(edits.pieces().begin(), edits.pieces().end(),
+                                    [](const EditPiece& piece) { return piece.end.nearest() <= s_longest; });
+    if (!isFine)
+        throw Failure(
+            fmt::format("{}: the pieces of the film are longer than {:.0f} s; keep less of it", recording, s_longest));
+}
 
 Style styleFor(const SourceOptions& options) {
     Style style = styleOf(options.style);
@@ -38,8 +55,10 @@ Style styleFor(const SourceOptions& options) {
 } // namespace
 
 Production::Production(const SourceOptions& options)
-    : options_(options), style_(styleFor(options)), input_(options.recording), recording_(input_.openSession()),
-      pictures_(input_.path(), input_.name()) {
+    : options_(options), style_(styleFor(options)), input_(options.recording), recording_(input_.openSession()) {
+    if (recording_.streams().empty())
+        return;
+    pictures_ = std::make_unique<PictureReader>(input_.path(), input_.name());
     if (!options.redactions.empty())
         redactions_ = Redactions::read(shortFile(options.redactions, "a list of redactions"), options.redactions);
     if (!redactions_.empty())
@@ -53,9 +72,13 @@ void Production::redact() {
     losses_ = redacted.losses;
     redactedFile_ =
         std::make_unique<Zulm::TemporaryFile>(std::filesystem::temp_directory_path().string(), "redacted", ".mp4");
-    std::ofstream(redactedFile_->path(), std::ios::binary) << std::string("\0\0\0\x10"
-                                                                          "ftypisom\0\0\2\0",
-                                                                          16);
+    using namespace std::string_literals;
+    std::ofstream file = Zulm::openOutput(redactedFile_->path(), redactedFile_->path());
+    file << "\0\0\0\x10"s
+            "ftypisom\0\0\2\0"s;
+    file.close();
+    if (!file)
+        throw Failure(fmt::format("{}: cannot be written; is the disk full?", redactedFile_->path()));
     std::vector<StreamSource> sources;
     for (const std::string& stream : redacted.streams)
         sources.push_back(StreamSource::memory(stream, recording_.name()).asStored());
@@ -65,14 +88,17 @@ void Production::redact() {
     } catch (const SaveError& error) {
         throw Failure(error.what());
     }
-    redacted_ = std::make_unique<Recording>(FileLocation(redactedFile_->path()));
+    redacted_ = std::make_unique<Recording>(openSource(redactedFile_->path(), recording_.name()), recording_.name());
 }
 
 double Production::duration() const {
-    const double length = recording_.duration().value_or(pictures_.duration().value_or(0));
-    if (!(length > 0) || length > 1e7)
+    const double length = recording_.duration().value_or(pictures_->duration().value_or(0));
+    if (!(length > 0))
         throw Failure(
             fmt::format("{}: does not tell how long it is; say with --keep what is shown", recording_.name()));
+    if (length > s_longest)
+        throw Failure(
+            fmt::format("{}: says that it is {:.0f} s long; say with --keep what is shown", recording_.name(), length));
     return length;
 }
 
@@ -95,19 +121,17 @@ EditList Production::withoutIdle(double least, double rest) const {
 FilmSize Production::sizeFor(int largestWidth) const {
     if (options_.size)
         return *options_.size;
-    const double width = pictures_.width() * pictures_.pixelAspect();
-    const double height = pictures_.height();
+    const double width = pictures_->width() * pictures_->pixelAspect();
+    const double height = pictures_->height();
     const double scale = std::min({1.0, s_largestSide / width, s_largestSide / height, largestWidth / width});
     const auto even = [](double value) { return std::max(16, 2 * static_cast<int>(std::lround(value / 2))); };
     return {even(width * scale), even(height * scale)};
 }
 
 void Production::prepare(const EditList& edits, const std::string& zoom, int largestWidth) {
-    if (edits.pieces().empty())
-        throw Failure(
-            fmt::format("{}: nothing of it is kept, and a film without a frame cannot be made", recording_.name()));
+    requireLength(edits, recording_.name());
     style_.zoom.isAutomatic = zoom.empty() ? style_.zoom.isAutomatic : zoom == "auto";
-    const PictureSize movie{pictures_.width() * pictures_.pixelAspect(), static_cast<double>(pictures_.height())};
+    const PictureSize movie{pictures_->width() * pictures_->pixelAspect(), static_cast<double>(pictures_->height())};
     stage_ = std::make_unique<Stage>(sizeFor(largestWidth), movie, style_);
     session_ = std::make_unique<FilmSession>(shown(), edits, style_, movie,
                                              [](const Error& error) { Zulm::warn(error.what()); });
@@ -122,24 +146,23 @@ void Production::prepare(const EditList& edits, const std::string& zoom, int lar
             return redactions_.hidesCursor(position, time);
         };
     }
-    composer_ = std::make_unique<Composer>(*session_, pictures_, *stage_, style_, cover);
+    composer_ = std::make_unique<Composer>(*session_, *pictures_, *stage_, style_, cover);
 }
 
 Zulm::ExitCode Production::complain() const {
-    const EditedRecording& edited = session_->edited();
-    for (const std::string& warning : edited.warnings)
-        Zulm::warn(fmt::format("{}: {}", recording_.name(), warning));
     std::vector<std::string> losses = losses_;
-    losses.insert(losses.end(), edited.losses.begin(), edited.losses.end());
-    if (pictures_.endedEarly())
+    if (pictures_->cannotSeek())
+        losses.emplace_back("its pictures cannot be sought in; the film shows later ones where it goes back");
+    if (pictures_->endedEarly())
         losses.emplace_back(
             "its pictures end before the movie does, as in a file that was cut off; the last one stays");
     for (const std::string& loss : losses)
         Zulm::complain(fmt::format("{}: {}", recording_.name(), loss));
-    return losses.empty() ? Zulm::ExitFine : Zulm::ExitDamaged;
+    const Zulm::ExitCode code = session_->streams().complain();
+    return losses.empty() ? code : Zulm::ExitDamaged;
 }
 
-std::string Production::shownRegion(const ByteSource& stored) const {
+Rect Production::shownRegion() const {
     const ScreenRect& region = session_->region();
     const PixelRect& frame = stage_->frame();
     const double unitX = region.width / frame.width;
@@ -147,28 +170,24 @@ std::string Production::shownRegion(const ByteSource& stored) const {
     const auto whole = [](double value) {
         return static_cast<std::int32_t>(std::lround(std::clamp(value, -2e9, 2e9)));
     };
-    const Rect shown(whole(region.x - frame.x * unitX), whole(region.y - frame.y * unitY),
-                     whole(stage_->film().width * unitX), whole(stage_->film().height * unitY));
-    std::string header(s_metaDataHeaderSize, '\0');
-    if (stored.read(0, header) < header.size())
-        return {};
-    std::ostringstream bytes;
-    bytes << header;
-    metaDataWrite<Rect>(0, shown, bytes, 1);
-    return bytes.str();
+    return Rect(whole(region.x - frame.x * unitX), whole(region.y - frame.y * unitY),
+                whole(stage_->film().width * unitX), whole(stage_->film().height * unitY));
 }
 
-std::vector<StreamSource> Production::streams() {
-    std::vector<StreamSource> sources;
-    for (const EditedStream& stream : session_->edited().streams) {
-        if (stream.source.type == RecordingRegionKind::type)
-            region_ = shownRegion(stream.bytes);
-        const bool isRegion = stream.source.type == RecordingRegionKind::type && !region_.empty();
-        sources.push_back((isRegion ? StreamSource::memory(region_, recording_.name())
-                                    : StreamSource::bytes(stream.bytes, recording_.name()))
-                              .asStored());
-    }
-    return sources;
+Zulm::RetimedStreams& Production::streams() {
+    Zulm::RetimedStreams& streams = session_->streams();
+    const PixelRect& frame = stage_->frame();
+    const bool showsMovieAlone = frame.width == stage_->film().width && frame.height == stage_->film().height &&
+                                 frame.width == pictures_->width() && frame.height == pictures_->height();
+    if (!recording_.has(RecordingRegionKind::type) && showsMovieAlone)
+        return streams;
+    const MetaDataHeader header{RecordingRegionKind::type, s_regionVersion, metaDataFixedEntrySize<Rect>()};
+    const auto headerBytes = std::bit_cast<std::array<char, sizeof header>>(header);
+    std::ostringstream bytes;
+    bytes.write(headerBytes.data(), headerBytes.size());
+    metaDataWrite<Rect>(0, shownRegion(), bytes, s_regionVersion);
+    streams.replace(RecordingRegionKind::type, bytes.str());
+    return streams;
 }
 
 } // namespace Render

@@ -7,7 +7,6 @@
 #include "Tools/render/Redactions.h"
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/InputFile.h"
-#include "ZULMetaDataBridge/Source/StreamSource.h"
 
 #include <memory>
 #include <string>
@@ -21,7 +20,8 @@ namespace Render {
 
 class Production {
 public:
-    /// Opens a recording. Throws `Zulm::Failure` and `ZULMetaData::Error`.
+    /// Opens a recording, and its pictures if it has streams; without them nothing else may be called. Throws
+    /// `Zulm::Failure` and `ZULMetaData::Error`.
     explicit Production(const SourceOptions& options);
     ~Production();
     Production(const Production&) = delete;
@@ -50,11 +50,11 @@ public:
     const Style& style() const { return style_; }
     FilmSession& session() { return *session_; }
     Composer& composer() { return *composer_; }
-    PictureReader& pictures() { return pictures_; }
+    PictureReader& pictures() { return *pictures_; }
 
     /// Returns the streams of the film, to be attached to it. The recorded region is that which all of the film shows
     /// while the camera is at rest.
-    std::vector<ZULMetaData::StreamSource> streams();
+    Zulm::RetimedStreams& streams();
 
     /// Warns of streams that nobody knows, and complains about what of the recording is not in the film. Call it when
     /// the film is done. Returns how the command ends.
@@ -63,7 +63,7 @@ public:
 private:
     FilmSize sizeFor(int largestWidth) const;
     void redact();
-    std::string shownRegion(const ZULMetaData::ByteSource& stored) const;
+    ZULMetaData::Rect shownRegion() const;
 
     SourceOptions options_;
     Style style_;
@@ -72,9 +72,8 @@ private:
     std::unique_ptr<Zulm::TemporaryFile> redactedFile_;
     std::unique_ptr<ZULMetaData::Recording> redacted_; ///< null if nothing is covered
     Redactions redactions_;
-    std::vector<std::string> losses_; ///< by covering
-    std::string region_;              ///< the stream of it that the film gets
-    PictureReader pictures_;
+    std::vector<std::string> losses_;         ///< by covering
+    std::unique_ptr<PictureReader> pictures_; ///< null if there is no stream
     std::unique_ptr<Stage> stage_;
     std::unique_ptr<FilmSession> session_;
     std::unique_ptr<Composer> composer_;

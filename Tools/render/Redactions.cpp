@@ -18,8 +18,9 @@ using namespace ZULMetaData;
 namespace {
 
 constexpr double s_rounding = 0.001; ///< seconds: movies round their times by less
-constexpr double s_cursor = 48;      ///< units of the display that a cursor reaches from its hot spot
-constexpr double s_titleBar = 48;    ///< units of the display around the upper edge of a window
+constexpr std::size_t s_mostPlaces = 1000;
+constexpr double s_cursor = 48;   ///< units of the display that a cursor reaches from its hot spot
+constexpr double s_titleBar = 48; ///< units of the display around the upper edge of a window
 
 ScreenRect screenRect(const Rect& rect) {
     return {static_cast<double>(rect.x), static_cast<double>(rect.y), static_cast<double>(rect.width),
@@ -39,6 +40,30 @@ bool touchesRect(const ScreenRect& area, const Rect& rect) {
     return touches(area, screenRect(rect));
 }
 
+/// Returns a track, or an empty one if its stream cannot be decoded. Such a stream is left out of the result.
+template <class Kind>
+const Track<Kind>& trackOf(const Recording& recording) {
+    static const Track<Kind> unknown;
+    try {
+        return recording.track<Kind>();
+    } catch (const Error&) {
+        return unknown;
+    }
+}
+
+/// Returns the same times as ranges that do not touch one another, in their order.
+std::vector<TimeRange> united(std::vector<TimeRange> ranges) {
+    std::sort(ranges.begin(), ranges.end(),
+              [](const TimeRange& left, const TimeRange& right) { return left.from < right.from; });
+    std::vector<TimeRange> result;
+    for (const TimeRange& range : ranges)
+        if (!result.empty() && range.from <= result.back().to)
+            result.back().to = std::max(result.back().to, range.to);
+        else
+            result.push_back(range);
+    return result;
+}
+
 bool touchesTitle(const ScreenRect& area, const Rect& window) {
     ScreenRect bar = screenRect(window);
     bar.y -= s_titleBar;
@@ -51,23 +76,28 @@ class Presence {
 public:
     explicit Presence(const std::vector<CoveredPlace>& places) : places_(places) {}
 
-    /// Returns the times in which the value of a track lies in one of the places. What is not known
-    /// counts if `countsUnknown`. If the values are places of something that `moves`, the time between two values
-    /// counts if one of them lies there.
+    /// Returns the times in which the value of a track lies in one of the places. What is not known counts if
+    /// `countsUnknown`. If the values are places of something that `moves`, the time between two values counts if one
+    /// of them lies there.
     template <class Kind>
     std::vector<TimeRange> of(const Track<Kind>& track,
                               bool (*lies)(const ScreenRect&, const typename Track<Kind>::Value&), bool countsUnknown,
                               bool moves = false) const {
         std::vector<TimeRange> ranges;
         for (const CoveredPlace& place : places_) {
+            const std::size_t before = ranges.size();
             const auto add = [&](double from, double to) {
-                if (from <= to)
+                if (ranges.size() > before && from <= ranges.back().to)
+                    ranges.back().to = std::max(ranges.back().to, to);
+                else if (from <= to)
                     ranges.push_back({from, to});
             };
             const auto times = track.times();
             if (countsUnknown)
                 add(place.from, track.empty() ? place.to : std::min(place.to, times.front()));
-            for (std::size_t i = 0; i < track.size(); ++i) {
+            const std::size_t holding = track.countUntil(place.from); // entries at one time may be the last of it
+            const std::size_t first = holding > 0 ? track.countUntil(std::nextafter(times[holding - 1], -HUGE_VAL)) : 0;
+            for (std::size_t i = first; i < track.size() && times[i] <= place.to; ++i) {
                 const double end = i + 1 < track.size() ? times[i + 1] : place.to;
                 const bool isThere = lies(place.area, track.values()[i]);
                 const bool goesThere = moves && i + 1 < track.size() && lies(place.area, track.values()[i + 1]);
@@ -75,14 +105,14 @@ public:
                     add(std::max(place.from, times[i]), std::min(place.to, end));
             }
         }
-        return ranges;
+        return united(std::move(ranges));
     }
 
     std::vector<TimeRange> always() const {
         std::vector<TimeRange> ranges;
         for (const CoveredPlace& place : places_)
             ranges.push_back({place.from, place.to});
-        return ranges;
+        return united(std::move(ranges));
     }
 
 private:
@@ -94,11 +124,11 @@ class Removal {
 public:
     Removal(const Recording& recording, const std::vector<CoveredPlace>& places) : always_(Presence(places).always()) {
         const Presence presence(places);
-        cursor_ = presence.of<CursorLocationKind>(recording.track<CursorLocationKind>(), touchesPoint, true, true);
-        const auto& windows = recording.track<TopmostWindowKind>();
+        cursor_ = presence.of<CursorLocationKind>(trackOf<CursorLocationKind>(recording), touchesPoint, true, true);
+        const auto& windows = trackOf<TopmostWindowKind>(recording);
         window_ = presence.of<TopmostWindowKind>(windows, touchesRect, true);
         title_ = presence.of<TopmostWindowKind>(windows, touchesTitle, true);
-        hover_ = presence.of<HoverRectKind>(recording.track<HoverRectKind>(), touchesRect, false);
+        hover_ = presence.of<HoverRectKind>(trackOf<HoverRectKind>(recording), touchesRect, false);
     }
 
     std::vector<TimeRange> timesOf(const uuid& kind) const {
@@ -127,29 +157,44 @@ private:
     std::vector<TimeRange> hover_;
 };
 
-} // namespace
+constexpr std::array s_sides{".x", ".y", ".width", ".height"};
 
-Redactions Redactions::read(std::string_view document, const std::string& file) {
+CoveredPlace readPlace(JsonFields& fields, const std::string& path) {
     constexpr double most = 1e7;
-    JsonFields fields(document, file, "zulm.redactions");
-    Redactions redactions;
-    const std::size_t count = fields.array("places");
-    for (std::size_t i = 0; i < count; ++i) {
-        const std::string path = fmt::format("places[{}]", i);
-        fields.section(path);
-        for (const char* member : {".from", ".to", ".x", ".y", ".width", ".height"})
-            if (!fields.has(path + member))
-                fields.failAt(path, fmt::format("has no \"{}\"", member + 1));
-        CoveredPlace place;
-        fields.number(path + ".from", 0, most, place.from);
-        fields.number(path + ".to", 0, most, place.to);
+    fields.section(path);
+    const auto isGiven = [&](const char* member) { return fields.has(path + member); };
+    const auto require = [&](const char* member) {
+        if (!isGiven(member))
+            fields.failAt(path, fmt::format("has no \"{}\"", member + 1));
+    };
+    require(".from");
+    require(".to");
+    CoveredPlace place;
+    place.area = {-2 * most, -2 * most, 4 * most, 4 * most}; // all of the picture
+    fields.number(path + ".from", 0, most, place.from);
+    fields.number(path + ".to", 0, most, place.to);
+    if (std::any_of(s_sides.begin(), s_sides.end(), isGiven)) {
+        std::for_each(s_sides.begin(), s_sides.end(), require);
         fields.number(path + ".x", -most, most, place.area.x);
         fields.number(path + ".y", -most, most, place.area.y);
         fields.number(path + ".width", 0, most, place.area.width);
         fields.number(path + ".height", 0, most, place.area.height);
-        if (place.to <= place.from || place.area.width <= 0 || place.area.height <= 0)
-            fields.failAt(path, "must have an area, and end after it begins");
-        redactions.places_.push_back(place);
+    }
+    if (place.to <= place.from || place.area.width <= 0 || place.area.height <= 0)
+        fields.failAt(path, "must have an area, and end after it begins");
+    return place;
+}
+
+} // namespace
+
+Redactions Redactions::read(std::string_view document, const std::string& file) {
+    JsonFields fields(document, file, "zulm.redactions");
+    Redactions redactions;
+    const std::size_t count = fields.array("places");
+    if (count > s_mostPlaces)
+        fields.failAt("places", fmt::format("has {} places; at most {} are covered", count, s_mostPlaces));
+    for (std::size_t i = 0; i < count; ++i) {
+        redactions.places_.push_back(readPlace(fields, fmt::format("places[{}]", i)));
     }
     fields.requireNothingLeft();
     return redactions;

@@ -29,7 +29,8 @@ public:
     Redactions() = default;
 
     /// Reads {"schema": "zulm.redactions", "schema_version": 1, "places": [{"from": 1, "to": 5, "x": 10, "y": 20,
-    /// "width": 300, "height": 40}]}. Throws `Zulm::Failure` that names the file, the line and the member.
+    /// "width": 300, "height": 40}]}. A place without a rectangle is all of the picture. Throws `Zulm::Failure` that
+    /// names the file, the line and the member.
     static Redactions read(std::string_view document, const std::string& file);
 
     bool empty() const { return places_.empty(); }

@@ -5,12 +5,17 @@
 #include "Tools/zulm/FileAccess.h"
 #include "Tools/zulm/OutputFile.h"
 
+#include <fmt/core.h>
+
+#include <cerrno>
+#include <cstdlib>
+#include <cstring>
 #include <filesystem>
 #include <system_error>
 
 namespace Render {
 
-void writePng(const YuvPicture& picture, const std::string& path, const std::string& recording, bool force) {
+void writePng(const YuvPicture& picture, const std::string& path, const std::vector<std::string>& inputs, bool force) {
     std::vector<std::uint32_t> pixels = rgbOf(picture);
     void* bytes = pixels.data();
     const SurfacePointer surface(cairo_image_surface_create_for_data(static_cast<unsigned char*>(bytes),
@@ -23,23 +28,42 @@ void writePng(const YuvPicture& picture, const std::string& path, const std::str
         return CAIRO_STATUS_SUCCESS;
     };
     if (cairo_surface_write_to_png_stream(surface.get(), append, &file) != CAIRO_STATUS_SUCCESS)
-        throw Zulm::Failure(path + ": the picture cannot be encoded");
-    Zulm::writeWholeFile(path, file, {recording}, force);
+        throw Zulm::Failure(path + ": the picture cannot be encoded; try a smaller --size");
+    Zulm::writeWholeFile(path, file, inputs, false);
 }
 
-WrittenFiles::WrittenFiles(const std::string& folder)
-    : folder_(folder), isNewFolder_(!std::filesystem::exists(folder)) {
+std::string countText(std::uint64_t count) {
+    return fmt::format("{}", count);
+}
+
+NewFiles::NewFiles(const std::string& folder) : folder_(folder), isNewFolder_(!std::filesystem::exists(folder)) {
     Zulm::createFolder(folder);
+    std::string name = (std::filesystem::path(folder) / ".unfinished.XXXXXX").string();
+    if (!mkdtemp(name.data()))
+        throw Zulm::Failure(fmt::format("{}: no folder can be created in it: {}", folder, std::strerror(errno)));
+    temporary_ = name;
 }
 
-WrittenFiles::~WrittenFiles() {
-    if (isKept_)
-        return;
+NewFiles::~NewFiles() {
     std::error_code ignored;
-    for (const std::string& path : paths_)
-        std::filesystem::remove(path, ignored);
+    std::filesystem::remove_all(temporary_, ignored);
     if (isNewFolder_)
-        std::filesystem::remove(folder_, ignored); // does nothing if somebody put a file into it
+        std::filesystem::remove(folder_, ignored); // does nothing if there are files in it
+}
+
+std::string NewFiles::add(const std::string& name) {
+    names_.push_back(name);
+    return (std::filesystem::path(temporary_) / name).string();
+}
+
+void NewFiles::keep() {
+    for (const std::string& name : names_) {
+        const std::filesystem::path place = std::filesystem::path(folder_) / name;
+        std::error_code error;
+        std::filesystem::rename(std::filesystem::path(temporary_) / name, place, error);
+        if (error)
+            throw Zulm::Failure(fmt::format("{}: cannot be put in place: {}", place.string(), error.message()));
+    }
 }
 
 } // namespace Render

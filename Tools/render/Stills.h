@@ -2,31 +2,39 @@
 
 #include "Tools/render/YuvPicture.h"
 
+#include <cstdint>
 #include <string>
 #include <vector>
 
 namespace Render {
 
-/// Writes a picture as a PNG file that appears whole or not at all. Throws `Zulm::Failure`.
-void writePng(const YuvPicture& picture, const std::string& path, const std::string& recording, bool force);
+/// Writes a picture as a PNG file that appears whole or not at all. `inputs` are the files that it was made of. Throws
+/// `Zulm::Failure`.
+void writePng(const YuvPicture& picture, const std::string& path, const std::vector<std::string>& inputs);
 
-/// The files that a command writes one after the other. They are removed again if it ends before all are there.
-class WrittenFiles {
+/// Returns a count for a line of progress.
+std::string countText(std::uint64_t count);
+
+/// The files of one folder, which appear together when all are written, or not at all.
+class NewFiles {
 public:
     /// Creates the folder if it does not exist. Throws `Zulm::Failure`.
-    explicit WrittenFiles(const std::string& folder);
-    ~WrittenFiles();
-    WrittenFiles(const WrittenFiles&) = delete;
-    WrittenFiles& operator=(const WrittenFiles&) = delete;
+    explicit NewFiles(const std::string& folder);
+    ~NewFiles();
+    NewFiles(const NewFiles&) = delete;
+    NewFiles& operator=(const NewFiles&) = delete;
 
-    void add(const std::string& path) { paths_.push_back(path); } ///< was written
-    void keep() { isKept_ = true; }                               ///< all are there
+    /// Returns where to write the file that will have this name.
+    std::string add(const std::string& name);
+
+    /// Puts all files in place. They replace what has their names. Throws `Zulm::Failure`.
+    void keep();
 
 private:
     std::string folder_;
+    std::string temporary_; ///< a folder inside of it
     bool isNewFolder_;
-    bool isKept_ = false;
-    std::vector<std::string> paths_;
+    std::vector<std::string> names_;
 };
 
 } // namespace Render

@@ -1,5 +1,6 @@
 #include "Tools/render/Style.h"
 
+#include "ShippedStyles.h"
 #include "Tools/render/JsonFields.h"
 #include "Tools/zulm/Failure.h"
 
@@ -7,15 +8,13 @@
 #include <fmt/ranges.h>
 
 #include <algorithm>
-#include <filesystem>
+#include <utility>
 
 namespace Render {
 
 using Zulm::Failure;
 
 namespace {
-
-namespace fs = std::filesystem;
 
 std::optional<Colour> colourOf(const std::string& text) {
     const bool isHex = text.size() > 1 && text.find_first_not_of("0123456789abcdefABCDEF", 1) == std::string::npos;
@@ -25,12 +24,16 @@ std::optional<Colour> colourOf(const std::string& text) {
     return Colour{part(1), part(3), part(5), text.size() == 9 ? part(7) : 1};
 }
 
-void readColour(JsonFields& fields, const std::string& path, Colour& result) {
+enum class Opacity : std::uint8_t { Full, Any };
+
+void readColour(JsonFields& fields, const std::string& path, Colour& result, Opacity opacity = Opacity::Any) {
     std::string text;
     fields.text(path, text);
     if (!fields.has(path))
         return;
     const auto colour = colourOf(text);
+    if (opacity == Opacity::Full && (!colour || text.size() > 7))
+        fields.failAt(path, "must be a colour such as \"#3d7bff\"");
     if (!colour)
         fields.failAt(path, "must be a colour such as \"#3d7bff\", or \"#3d7bff80\" with its opacity");
     result = *colour;
@@ -38,12 +41,14 @@ void readColour(JsonFields& fields, const std::string& path, Colour& result) {
 
 void readBackground(JsonFields& reader, Style::Background& background) {
     reader.section("background");
-    readColour(reader, "background.color", background.from);
+    if (reader.has("background.color"))
+        background.to.reset();
+    readColour(reader, "background.color", background.from, Opacity::Full);
     if (reader.has("background.to")) {
         if (!reader.has("background.color"))
             reader.failAt("background.to", "needs \"background.color\", the other end of the gradient");
         background.to.emplace();
-        readColour(reader, "background.to", *background.to);
+        readColour(reader, "background.to", *background.to, Opacity::Full);
     }
     reader.number("background.angle", -360, 360, background.angle);
 }
@@ -73,26 +78,9 @@ void readKeys(JsonFields& reader, Style::Keys& keys) {
     readColour(reader, "keys.background", keys.background);
 }
 
-fs::path styleFolder() {
-    std::error_code error;
-    const fs::path own = fs::read_symlink("/proc/self/exe", error);
-    const fs::path installed = own.parent_path().parent_path() / "share" / "zulm" / "styles";
-    return !error && fs::is_directory(installed, error) ? installed : fs::path(ZULM_STYLES);
-}
-
-} // namespace
-
-std::optional<KeyDisplay> keyDisplayOf(const std::string& name) {
-    if (name == "shown")
-        return KeyDisplay::Shown;
-    if (name == "shortcuts")
-        return KeyDisplay::Shortcuts;
-    return name == "hidden" ? std::optional(KeyDisplay::Hidden) : std::nullopt;
-}
-
-Style readStyle(std::string_view document, const std::string& file) {
+/// Returns the style with what a document changes.
+Style changed(Style style, std::string_view document, const std::string& file) {
     JsonFields reader(document, file, "zulm.style");
-    Style style;
     std::string comment;
     reader.text("name", comment);
     readBackground(reader, style.background);
@@ -116,26 +104,38 @@ Style readStyle(std::string_view document, const std::string& file) {
     return style;
 }
 
-std::vector<std::string> installedStyles() {
-    std::vector<std::string> names;
-    std::error_code error;
-    for (const fs::directory_entry& entry : fs::directory_iterator(styleFolder(), error))
-        if (entry.path().extension() == ".json")
-            names.push_back(entry.path().stem().string());
-    std::sort(names.begin(), names.end());
-    return names;
+} // namespace
+
+std::optional<KeyDisplay> keyDisplayOf(const std::string& name) {
+    if (name == "shown")
+        return KeyDisplay::Shown;
+    if (name == "shortcuts")
+        return KeyDisplay::Shortcuts;
+    return name == "hidden" ? std::optional(KeyDisplay::Hidden) : std::nullopt;
+}
+
+Style readStyle(std::string_view document, const std::string& file) {
+    return changed(changed({}, s_productStyle, "product"), document, file);
+}
+
+std::vector<std::string> shippedStyles() {
+    return {"plain", "product"};
+}
+
+bool isShippedStyle(const std::string& name) {
+    const std::vector<std::string> names = shippedStyles();
+    return std::find(names.begin(), names.end(), name) != names.end();
 }
 
 Style styleOf(const std::string& name) {
-    std::error_code error;
-    if (fs::is_regular_file(name, error))
-        return readStyle(shortFile(name, "a style"), name);
-    const std::vector<std::string> names = installedStyles();
-    if (std::find(names.begin(), names.end(), name) == names.end())
-        throw Failure(fmt::format("{}: neither a file nor a style that is installed; these are: {}", name,
-                                  fmt::join(names, ", ")));
-    const fs::path file = styleFolder() / (name + ".json");
-    return readStyle(shortFile(file.string(), "a style"), file.string());
+    if (isShippedStyle(name))
+        return readStyle(name == "plain" ? s_plainStyle : s_productStyle, name);
+    if (name.find('/') == std::string::npos && !name.ends_with(".json"))
+        throw Failure(
+            fmt::format("{}: no style has this name; there are {}, and files whose names end in .json or have "
+                        "a slash",
+                        name, fmt::join(shippedStyles(), ", ")));
+    return readStyle(shortFile(name, "a style"), name);
 }
 
 } // namespace Render

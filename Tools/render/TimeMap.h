@@ -31,6 +31,9 @@ public:
     /// Returns what is shown at a time of the film; what is outside of it counts as its edge.
     FilmTime at(double film) const;
 
+    /// Returns how many seconds of the film have passed since the piece that is shown began.
+    double sinceCut(const FilmTime& now) const { return now.film - pieces_[now.piece].base; }
+
     /// Returns how many seconds of the film have passed since a time of the recording. Empty if that time is not in
     /// the same piece, or is later. A frame that is held looks as it looked in the recording.
     std::optional<double> since(double source, const FilmTime& now) const;

@@ -10,6 +10,7 @@
 
 #include <fmt/core.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cmath>
 #include <cstring>
@@ -56,6 +57,17 @@ RetimedStreams::RetimedStreams(const Recording& recording, const EditList& edits
 }
 
 RetimedStreams::~RetimedStreams() = default;
+
+void RetimedStreams::replace(const uuid& kind, const std::string& bytes) {
+    auto found = std::find_if(edited_.streams.begin(), edited_.streams.end(),
+                              [&kind](const EditedStream& stream) { return stream.source.type == kind; });
+    if (found == edited_.streams.end())
+        found = edited_.streams.insert(found, EditedStream{});
+    found->source.type = kind;
+    found->isCopied = true;
+    found->bytes = ByteSource::memory(bytes);
+    found->size = bytes.size();
+}
 
 std::vector<StreamSource> RetimedStreams::sources() const {
     std::vector<StreamSource> sources;

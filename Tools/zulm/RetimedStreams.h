@@ -29,6 +29,11 @@ public:
     RetimedStreams(const RetimedStreams&) = delete;
     RetimedStreams& operator=(const RetimedStreams&) = delete;
 
+    const ZULMetaData::EditedRecording& edited() const { return edited_; }
+
+    /// Takes these bytes, header included, as the stream of a kind, whether or not the recording has one.
+    void replace(const ZULMetaData::uuid& kind, const std::string& bytes);
+
     /// What is attached.
     std::vector<ZULMetaData::StreamSource> sources() const;
 
