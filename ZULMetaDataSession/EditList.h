@@ -70,6 +70,9 @@ struct EditListOptions {
 /// order.
 class ZULMETADATA_API EditList {
 public:
+    static constexpr std::uint64_t s_largestFile = 64
+                                                   << 20; ///< bytes of a text that `open` reads; movies may be larger
+
     /// Adds [start, end) at a speed. Throws `Error` and adds nothing if a time is negative, `end` is not after `start`,
     /// or the speed is not above 0; also if a number or the length of the edited movie is too large for a double, if a
     /// number has more than 1,000 digits, or if the length cannot be written with 65,536 binary digits above and below

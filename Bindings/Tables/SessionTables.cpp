@@ -190,7 +190,7 @@ Table clickRows(const InsightSources& sources, const InsightOptions& options, do
 
 /// One row for each key, because captions grow while they are shown.
 Table captionRows(const InsightSources& sources, const InsightOptions& options, double) {
-    const std::vector<KeyCaption> captions = keyCaptions(sources.keys, options.captions);
+    const std::vector<KeyCaption> captions = keyCaptions(sources.keys, options.captions, sources.duration);
     struct Row {
         const KeyCaption* caption;
         const CaptionKey* key;

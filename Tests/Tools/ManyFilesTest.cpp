@@ -150,6 +150,9 @@ TEST_F(ManyFiles, AreListedOnStandardInputToo) {
     const ToolResult twice = runTool({"info", "--files-from", "-", "-"}, options);
     EXPECT_EQ(twice.exitCode, 2);
     EXPECT_THAT(twice.errors, HasSubstr("standard input cannot be the list and a recording"));
+    const ToolResult doubled = runTool({"info", "-", other, "-"}, options);
+    EXPECT_EQ(doubled.exitCode, 2);
+    EXPECT_THAT(doubled.errors, HasSubstr("standard input cannot be two recordings"));
     options.input = "-\n";
     options.folder = folder.path();
     EXPECT_THAT(runTool({"info", "--files-from", "-"}, options).errors, HasSubstr("./-: no such file"));

@@ -3,8 +3,8 @@
 #include <fmt/core.h>
 
 #include <algorithm>
+#include <array>
 #include <iostream>
-#include <iterator>
 
 namespace Zulm {
 
@@ -51,14 +51,22 @@ auto orFailure(const char* option, const std::string& text, Read read) {
     }
 }
 
+/// Returns what standard input holds, or at least so much of it that no edit list is as large.
+std::string listOnStandardInput() {
+    std::string text;
+    std::array<char, 1 << 16> piece;
+    while (text.size() <= EditList::s_largestFile && (std::cin.read(piece.data(), piece.size()), std::cin.gcount() > 0))
+        text.append(piece.data(), static_cast<std::size_t>(std::cin.gcount()));
+    return text;
+}
+
 EditList readList(const EditOptions& options, const Recording& recording) {
     EditListOptions listOptions;
     listOptions.frameRate = options.frameRate;
     if (const auto duration = recording.duration())
         listOptions.duration = Rational::of(*duration);
     if (options.file == "-") {
-        const std::string text{std::istreambuf_iterator<char>(std::cin), {}};
-        return EditList::open(ByteSource::memory(text), options.file, listOptions);
+        return EditList::open(ByteSource::memory(listOnStandardInput()), options.file, listOptions);
     }
     requireFile(options.file);
     return EditList::open(FileLocation(options.file), listOptions);

@@ -50,8 +50,11 @@ void addManyFiles(CLI::App& command, ManyFiles& files, const std::string& descri
 void requireFiles(const ManyFiles& files) {
     if (files.named.empty() && files.list.empty())
         throw CLI::RequiredError("FILE");
-    if (isDash(files.list) && std::any_of(files.named.begin(), files.named.end(), isDash))
+    const auto dashes = std::count_if(files.named.begin(), files.named.end(), isDash);
+    if (isDash(files.list) && dashes > 0)
         throw CLI::ValidationError("--files-from", "standard input cannot be the list and a recording");
+    if (dashes > 1)
+        throw CLI::ValidationError("FILE", "standard input cannot be two recordings; name - once");
     constexpr std::uint64_t mostJobs = 1024;
     if (files.jobs > mostJobs)
         throw CLI::ValidationError("--jobs",

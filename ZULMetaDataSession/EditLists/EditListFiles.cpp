@@ -15,7 +15,6 @@ namespace {
 
 using detail::JsonValue;
 
-constexpr std::uint64_t s_largestText = 64 << 20;
 constexpr std::string_view s_byteOrderMark = "\xef\xbb\xbf";
 
 struct NamedFormat {
@@ -82,7 +81,7 @@ EditList readDocument(std::string_view text, const std::string& name, const Edit
 }
 
 std::string textOf(const ByteSource& bytes, const std::string& name) {
-    if (bytes.size() > s_largestText)
+    if (bytes.size() > EditList::s_largestFile)
         throw Error(name, "the file is larger than 64 MiB; no edit list is");
     std::string text(static_cast<std::size_t>(bytes.size()), '\0');
     text.resize(bytes.read(0, text));

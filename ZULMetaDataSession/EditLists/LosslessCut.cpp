@@ -86,8 +86,9 @@ bool takeRow(std::string_view& text, char separator, std::vector<std::string>& f
     return !isQuoted;
 }
 
-/// Returns the character between the columns of a table: that which comes first.
+/// Returns the character between the columns of a table: that which comes first in its first line.
 char separatorOf(std::string_view text) {
+    text.remove_prefix(std::min(text.find_first_not_of("\r\n"), text.size()));
     const std::size_t first = text.find_first_of(",\t\r\n");
     return first != std::string_view::npos && text[first] == '\t' ? '\t' : ',';
 }

@@ -59,7 +59,7 @@ Insights insightsOf(const InsightSources& sources, const InsightOptions& options
     insights.duration = duration;
     insights.screen = sources.screen;
     insights.clicks = clicksOf(sources.actions, sources.positions, duration, options.clicks);
-    insights.captions = keyCaptions(sources.keys, options.captions);
+    insights.captions = keyCaptions(sources.keys, options.captions, duration);
     insights.idle =
         idleSpansOf(sources.positions, sources.actions, sources.keys, sources.scrolling, duration, options.idle);
     insights.chapters = chaptersOf(sources.titles, sources.applications, sources.slides, duration, options.chapters);

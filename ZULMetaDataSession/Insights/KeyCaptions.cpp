@@ -106,22 +106,27 @@ std::size_t lengthOf(const std::string& text) {
 
 } // namespace
 
-std::vector<KeyCaption> keyCaptions(const Track<KeyboardActionKind>& keys, const KeyCaptionOptions& options) {
+std::vector<KeyCaption> keyCaptions(const Track<KeyboardActionKind>& keys, const KeyCaptionOptions& options,
+                                    double duration) {
     std::vector<KeyCaption> captions;
     bool isLineEnded = true;
+    std::size_t length = 0; // of the last caption, in characters
     for (std::size_t i = 0; i < keys.size(); ++i) {
         const double time = keys.times()[i];
         const KeyName name = captionNameOf(keys.values()[i]);
         CaptionKey key = captionKey(time, keys.values()[i], name, options);
+        const bool isSeparate = !captions.empty() && !(key.isTyped && captions.back().keys.back().isTyped);
+        const std::size_t added = lengthOf(key.label) + (isSeparate ? 1 : 0);
         const bool isNew = isLineEnded || time - captions.back().keys.back().time >= options.pause ||
-                           lengthOf(captions.back().text) + lengthOf(key.label) > options.lineLength;
+                           length + added > options.lineLength;
         if (isNew)
             captions.push_back({time, 0, {}, {}});
         KeyCaption& caption = captions.back();
-        if (!isNew && !(key.isTyped && caption.keys.back().isTyped))
+        if (!isNew && isSeparate)
             caption.text += ' ';
         caption.text += key.label;
-        caption.end = time + options.hold;
+        length = isNew ? lengthOf(key.label) : length + added;
+        caption.end = duration > time ? std::min(time + options.hold, duration) : time + options.hold;
         caption.keys.push_back(std::move(key));
         isLineEnded = endsLine(name);
     }

@@ -9,6 +9,7 @@
 #include "../Track.h"
 
 #include <cstddef>
+#include <limits>
 #include <string>
 #include <vector>
 
@@ -46,9 +47,11 @@ struct KeyCaption {
     friend bool operator==(const KeyCaption&, const KeyCaption&) = default; ///< compares all fields
 };
 
-/// Joins keys that follow one another without a pause, up to the Return key or the end of a line.
+/// Joins keys that follow one another without a pause, up to the Return key or the end of a line. A caption ends at the
+/// latest when the recording of `duration` seconds does, unless its last key was not pressed before that.
 ZULMETADATA_API std::vector<KeyCaption> keyCaptions(const Track<KeyboardActionKind>& keys,
-                                                    const KeyCaptionOptions& options = {});
+                                                    const KeyCaptionOptions& options = {},
+                                                    double duration = std::numeric_limits<double>::infinity());
 
 /// Returns whether a key types a character, as `CaptionKey::isTyped` tells it: special keys and shortcuts do not.
 ZULMETADATA_API bool typesCharacter(const KeyInput& key);

@@ -250,6 +250,8 @@ def scan(
     recording cannot be read, its error is raised, or, if `on_error` is "skip" or "report", the others are read all the
     same; "report" says afterwards what failed and why. A recording without entries of the kind is no failure.
     """
+    if isinstance(columns, str):
+        raise TypeError(f"columns is a list of names, such as [{columns!r}]")
     return Scan(recordings, kind, None if columns is None else list(columns), on_error)
 
 

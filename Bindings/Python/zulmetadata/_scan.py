@@ -47,7 +47,7 @@ def _paths_of(recordings: _Path | Iterable[_Path]) -> Iterator[str]:
     if not isinstance(recordings, (str, os.PathLike)):
         yield from (os.fspath(path) for path in recordings)
     elif glob.has_magic(os.fspath(recordings)) and not os.path.lexists(recordings):
-        yield from sorted(glob.iglob(os.fspath(recordings), recursive=True))
+        yield from sorted(set(glob.iglob(os.fspath(recordings), recursive=True)))  # ** finds some more than once
     else:
         yield os.fspath(recordings)
 

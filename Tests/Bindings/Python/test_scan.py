@@ -87,6 +87,13 @@ def test_what_cannot_be_asked_is_refused_at_once(recordings, wrong):
         zulmetadata.scan(pattern(recordings), KIND, **wrong)
     with pytest.raises(KeyError):
         zulmetadata.scan(pattern(recordings), "nothing")
+    with pytest.raises(TypeError, match="list of names"):
+        zulmetadata.scan(pattern(recordings), KIND, columns="x")
+
+
+def test_a_recording_that_a_pattern_finds_twice_is_read_once(recordings):
+    found = list(zulmetadata.scan(recordings / "**" / "**" / "5.dat", KIND))
+    assert [pathlib.Path(batch.recording) for batch in found] == [recordings / "5.dat"]
 
 
 def test_failures_are_raised_or_passed_over_or_reported(damaged):

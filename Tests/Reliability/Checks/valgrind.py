@@ -21,17 +21,26 @@ MEMCHECK = ["valgrind", "--quiet", f"--error-exitcode={ERRORS_FOUND}", "--leak-c
 LEFT_OUT = [
     "ImageWithoutMemory.ThrowsWhateverItIsNeededFor",
     "DumpCommand.NeedsNoMoreMemoryForMoreEntries",
+    "MetaDataValidator.AsksForNoMoreMemoryThanTwiceTheFileAnd16MiB",
+    "MetaDataValidator.LetsGoOfALargeImageBeforeItDecodesASmallTIFF",
     "BelievedSize.MakesAReaderOfAFewBytesAskForAllTheMemoryThatItSays",
     "TextReader.AsksForLittleMoreMemoryThanThereIsInputUntilItEnds",
     "TextReader.WrapsASizeBelowThatOfTheTimeAround",
 ]
-# Tests of large pictures of one colour. They take minutes and cover few lines, so only the long form runs them.
+# Tests of large pictures of one colour, of millions of entries or random edits, and of every number or character. They take minutes and
+# cover few lines, so only the long form runs them.
 SLOW = [
+    "*Million*",
+    "EditList.RefusesDeepAndLargeDocuments",
+    "EditList.RefusesDenominatorsWithoutEnd",
+    "Retiming.DoesWhatTheOracleDoesForRandomEdits",
     "EncodedImageCheck.DoesNotUnpackAGigabyteOfPixels",
     "EncodedImageCheck.DoesNotUnpackALargeTIFFFile",
     "EncodedImageCheck.SeesWrongCheckSumsInAPictureThatIsTooLargeToUnpack",
     "PNGDecode.LargePicturesOfOneColourAreNotTakenForHostileOnes",
     "TIFFDecode.LargePicturesOfOneColourAreNotTakenForHostileOnes",
+    "UTF8.HasEveryCharacterInItsShortestFormUnlessItIsASurrogate",
+    "UTF8.HasNothingAboveTheLastCharacter",
 ]
 PARTS = 4  # into which each test program is divided, so that all workers end at about the same time
 

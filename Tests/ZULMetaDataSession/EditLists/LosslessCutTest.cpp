@@ -92,6 +92,11 @@ TEST(CutTable, TakesQuotationMarksInsideAFieldForThemselves) {
     EXPECT_THAT(piecesOf("1,2,a,\"12\n\",\"\"\n3,4\n", "a.csv"), ElementsAre("1-2@1=1", "3-4@1=1"));
 }
 
+TEST(CutTable, KnowsItsTabsAfterEmptyLines) {
+    EXPECT_THAT(piecesOf("\n\r\n1\t2,5\n", "a.tsv"),
+                ElementsAre("a.tsv: row 3: \"2,5\" is no time such as 12.5 or 00:01:30.5"));
+}
+
 TEST(CutTable, ReadsTabsAndTimeCodes) {
     EXPECT_THAT(piecesOf("00:00:10.500\t00:01:00.000\ta, b\n", "a.tsv"), ElementsAre("21/2-60@1=99/2"));
     EXPECT_THAT(piecesOf("\t00:01:00.000\t\n", "a.tsv"), ElementsAre("0-60@1=60"));

@@ -174,6 +174,25 @@ TEST(KeyCaptions, HoldTheirKeysInTheOrderOfTheirTimes) {
     EXPECT_THAT(areTyped, ElementsAre(true, true, true, false));
 }
 
+TEST(KeyCaptions, CountTheSpaceBetweenTwoKeysInALine) {
+    const Track<KeyboardActionKind> track = keys({{1, {'a', 0}}, {1, {s_up, s_virtualKey}}});
+    KeyCaptionOptions options = shown();
+    options.lineLength = 5;
+    EXPECT_THAT(textsOf(keyCaptions(track, options)), ElementsAre("a", "[up]"));
+    options.lineLength = 6;
+    EXPECT_THAT(textsOf(keyCaptions(track, options)), ElementsAre("a [up]"));
+}
+
+TEST(KeyCaptions, EndWithTheRecordingUnlessTheirLastKeyComesLater) {
+    const auto endOf = [](double time, double duration) {
+        return keyCaptions(typed(time, "a"), {}, duration).at(0).end;
+    };
+    EXPECT_EQ(endOf(1, 2), 2);
+    EXPECT_EQ(endOf(1, 60), 2.5);
+    EXPECT_EQ(endOf(2, 2), 3.5);
+    EXPECT_EQ(endOf(3, 2), 4.5);
+}
+
 TEST(KeyCaptions, StayAfterTheirLastKey) {
     KeyCaptionOptions options;
     options.hold = 4;
