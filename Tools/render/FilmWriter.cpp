@@ -187,6 +187,7 @@ void FilmWriter::writePicture(const YuvPicture& picture) {
         throw std::bad_alloc();
     frame->pts = output_->pictureTime++;
     frame->pict_type = AV_PICTURE_TYPE_NONE;
+    frame->quality = output_->pictures->global_quality; // of encoders without a constant rate factor
     encode(*output_->pictures, *output_->pictureStream, frame.get());
 }
 

@@ -226,8 +226,8 @@ Zulm::ExitCode makeGuide(const GuideOptions& options) {
         progress.moveTo(i + 1);
     }
     const std::string title = fs::path(options.recording).stem().string();
-    Zulm::writeWholeFile(files.add(s_htmlName), htmlOf(steps, title), inputsOf(options), false);
-    Zulm::writeWholeFile(files.add(s_markdownName), markdownOf(steps, title), inputsOf(options), false);
+    writeNew(files.add(s_htmlName), htmlOf(steps, title), inputsOf(options));
+    writeNew(files.add(s_markdownName), markdownOf(steps, title), inputsOf(options));
     files.keep();
     removeOlderPictures(folder, steps.size());
     if (!Zulm::settings().quiet)

@@ -33,6 +33,14 @@ std::string textOf(int error) {
     return text.data();
 }
 
+std::int64_t durationOf(const AVFrame& frame) {
+#if LIBAVUTIL_VERSION_INT >= AV_VERSION_INT(57, 30, 100)
+    return frame.duration;
+#else
+    return frame.pkt_duration;
+#endif
+}
+
 FramePointer newFrame() {
     return required(FramePointer(av_frame_alloc()));
 }

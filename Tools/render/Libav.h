@@ -10,6 +10,7 @@ extern "C" {
 #include <libswscale/swscale.h>
 }
 
+#include <cstdint>
 #include <memory>
 #include <string>
 
@@ -35,6 +36,9 @@ using GraphPointer = std::unique_ptr<AVFilterGraph, Releaser<avfilter_graph_free
 
 /// Returns what an error of these libraries is called.
 std::string textOf(int error);
+
+/// Returns how long a picture is shown, in units of its stream.
+std::int64_t durationOf(const AVFrame& frame);
 
 /// Return new objects. Throw `std::bad_alloc`.
 ///@{

@@ -104,9 +104,6 @@ bool PictureReader::send() {
             return avcodec_send_packet(decoder_.get(), nullptr) >= 0;
         }
         if (packet->stream_index == stream_) {
-            if (packet->pts != AV_NOPTS_VALUE)
-                packetsEnd_ = std::max(packetsEnd_, static_cast<double>(packet->pts + packet->duration) *
-                                                        av_q2d(movie_.input->streams[stream_]->time_base));
             avcodec_send_packet(decoder_.get(), packet.get()); // what is damaged shows as a picture that is missing
             return true;
         }
@@ -121,6 +118,8 @@ std::optional<PictureReader::Decoded> PictureReader::next() {
         if (error >= 0) {
             decoded.time = secondsOf(*decoded.frame);
             lastTime_ = decoded.time;
+            lastEnd_ = lastTime_ + static_cast<double>(durationOf(*decoded.frame)) *
+                                       av_q2d(movie_.input->streams[stream_]->time_base);
             return decoded;
         }
         if (error == AVERROR_EOF || isFlushing_ || (!send() && isFlushing_))
@@ -152,7 +151,8 @@ void PictureReader::noteEnd(double time) {
         end = static_cast<double>(start) * av_q2d(stream.time_base) +
               static_cast<double>(stream.duration) * av_q2d(stream.time_base);
     }
-    if (isUnreadable_ || packetsEnd_ + least < std::min(time, end))
+    const bool shouldGoOn = isUnreadable_ || lastEnd_ + least < end;
+    if (shouldGoOn && time > lastEnd_ + least)
         endedEarly_ = true;
 }
 
@@ -161,9 +161,9 @@ void PictureReader::advance(double time) {
         if (!following_ && !isAtEnd_) {
             following_ = next();
             isAtEnd_ = !following_;
-            if (isAtEnd_)
-                noteEnd(time);
         }
+        if (!following_)
+            noteEnd(time);
         if (!following_ || (current_ && following_->time > time + s_rounding))
             return;
         current_ = std::move(following_);

@@ -73,8 +73,8 @@ private:
     bool isUnreadable_ = false; ///< reading ended by an error
     bool endedEarly_ = false;
     bool cannotSeek_ = false;
-    double packetsEnd_ = 0; ///< when the last packet ends that was read, in seconds
-    double lastTime_ = 0;
+    double lastTime_ = 0; ///< when the picture begins that was decoded last, in seconds
+    double lastEnd_ = 0;  ///< when it ends
     YuvPicture picture_;
     bool isPrepared_ = false;
     std::uint64_t number_ = 0;

@@ -11,11 +11,22 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <fstream>
 #include <system_error>
 
 namespace Render {
 
-void writePng(const YuvPicture& picture, const std::string& path, const std::vector<std::string>& inputs, bool force) {
+void writeNew(const std::string& path, const std::string& contents, const std::vector<std::string>& inputs) {
+    const Zulm::FileAccess access(path, inputs);
+    std::ofstream file = Zulm::openOutput(path, path);
+    file.write(contents.data(), static_cast<std::streamsize>(contents.size()));
+    file.close();
+    if (!file)
+        throw Zulm::Failure(fmt::format("{}: cannot be written: {}; is the disk full?", path, std::strerror(errno)));
+    access.applyTo(path);
+}
+
+void writePng(const YuvPicture& picture, const std::string& path, const std::vector<std::string>& inputs) {
     std::vector<std::uint32_t> pixels = rgbOf(picture);
     void* bytes = pixels.data();
     const SurfacePointer surface(cairo_image_surface_create_for_data(static_cast<unsigned char*>(bytes),
@@ -29,7 +40,7 @@ void writePng(const YuvPicture& picture, const std::string& path, const std::vec
     };
     if (cairo_surface_write_to_png_stream(surface.get(), append, &file) != CAIRO_STATUS_SUCCESS)
         throw Zulm::Failure(path + ": the picture cannot be encoded; try a smaller --size");
-    Zulm::writeWholeFile(path, file, inputs, false);
+    writeNew(path, file, inputs);
 }
 
 std::string countText(std::uint64_t count) {

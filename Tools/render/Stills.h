@@ -8,8 +8,11 @@
 
 namespace Render {
 
-/// Writes a picture as a PNG file that appears whole or not at all. `inputs` are the files that it was made of. Throws
-/// `Zulm::Failure`.
+/// Writes a file that does not exist, into a folder that nobody else can look into. It gets the permissions of a file
+/// made of the inputs. Throws `Zulm::Failure`.
+void writeNew(const std::string& path, const std::string& contents, const std::vector<std::string>& inputs);
+
+/// The same for a picture, as a PNG file.
 void writePng(const YuvPicture& picture, const std::string& path, const std::vector<std::string>& inputs);
 
 /// Returns a count for a line of progress.

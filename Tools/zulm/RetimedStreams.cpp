@@ -15,6 +15,7 @@
 #include <cmath>
 #include <cstring>
 #include <fstream>
+#include <utility>
 
 namespace Zulm {
 
@@ -58,15 +59,15 @@ RetimedStreams::RetimedStreams(const Recording& recording, const EditList& edits
 
 RetimedStreams::~RetimedStreams() = default;
 
-void RetimedStreams::replace(const uuid& kind, const std::string& bytes) {
+void RetimedStreams::replace(const uuid& kind, std::string bytes) {
     auto found = std::find_if(edited_.streams.begin(), edited_.streams.end(),
                               [&kind](const EditedStream& stream) { return stream.source.type == kind; });
     if (found == edited_.streams.end())
         found = edited_.streams.insert(found, EditedStream{});
     found->source.type = kind;
     found->isCopied = true;
-    found->bytes = ByteSource::memory(bytes);
-    found->size = bytes.size();
+    found->bytes = ByteSource::memory(replacements_.emplace_back(std::move(bytes)));
+    found->size = found->bytes.size();
 }
 
 std::vector<StreamSource> RetimedStreams::sources() const {

@@ -15,5 +15,5 @@ endforeach()
 if(ZULM_VIEWER AND CHROMIUM AND ZULMETADATA_RENDERER)
   add_test(NAME Tools/render/page
     COMMAND ${CMAKE_COMMAND} -E env ${viewer_settings} ${render_programs} ${NODE} --test ${render_tests}/page.test.mjs)
-  set_tests_properties(Tools/render/page PROPERTIES TIMEOUT 600)
+  set_tests_properties(Tools/render/page PROPERTIES TIMEOUT 1200)
 endif()

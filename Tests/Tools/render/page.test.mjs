@@ -12,6 +12,7 @@ const size = { width: 640, height: 360 };
 const seconds = 10;
 const count = 200;
 const most = 0.5; // pixels
+const layers = ['2', '3', '4', '5']; // of the page, which would be drawn over the cursor or beside it
 
 /// Numbers from 0 up to 1 that look random, and are the same in every run.
 function* numbers(seed) {
@@ -77,6 +78,7 @@ async function fromPage({ page: path }, times) {
   const { page, problems, close } = await open(path, { size: [1500, 1000] });
   await opened(page);
   await ready(page);
+  for (const key of layers) await page.keyboard.press(key);
   const places = [];
   for (const time of times) {
     await page.evaluate((time) => zulmViewer.seek(time), time);

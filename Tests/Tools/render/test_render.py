@@ -7,6 +7,7 @@ import array
 import json
 import os
 import pathlib
+import random
 import re
 import signal
 import struct
@@ -135,7 +136,7 @@ class Marker(Films):
 
     def test_a_movie_of_variable_frame_rate(self):
         marker_recording(self.movie, 640, 360, 4, options=["-vf", "select='not(eq(mod(n,3),1))'", "-vsync", "vfr"])
-        self.check(most=1.5)
+        self.check(most=1.01)
 
     def test_a_turned_movie(self):
         marker_recording(self.folder / "Straight.mp4", 640, 360, 2)
@@ -185,12 +186,8 @@ class Marker(Films):
         movie = self.folder / "Movie.avi"
         ffmpeg("-i", self.folder / "Movie.mp4", "-c:v", "mpeg4", "-q:v", "2", movie)
         chunks = b"".join(b"DATA" + struct.pack("<I", len(data)) + data + bytes(len(data) % 2) for data in streams.values())
-        with open(movie, "r+b") as file:
-            file.seek(0, 2)
+        with open(movie, "ab") as file:
             file.write(b"ZULM" + struct.pack("<I", len(chunks)) + chunks)
-            whole = file.tell()
-            file.seek(4)
-            file.write(struct.pack("<I", whole - 8))
         self.check(movie=movie)
 
 
@@ -382,7 +379,7 @@ class Styles(Films):
         frame = next(frames_of(self.film, 160, 90))
         self.assertGreater(frame[0], 250)
         self.assertGreater(frame[89 * 160 + 159], 250)
-        for x, y in ((80, 45), (80, 2), (80, 87), (4, 45), (155, 45)):
+        for x, y in ((60, 45), (60, 2), (60, 87), (4, 45), (155, 45)):
             self.assertAlmostEqual(frame[y * 160 + x], 90, delta=5, msg=f"at {x}, {y}")
 
     def test_the_schema_takes_what_the_renderer_takes(self):
@@ -546,11 +543,17 @@ class Outputs(Films):
         run(self.movie, "-o", self.film, "--force")
         self.assertNotEqual(self.film.read_bytes()[:4], b"mine")
 
+    @staticmethod
+    def interruptible(*words):
+        """A renderer that SIGINT ends, also if these tests ignore it because they run in the background."""
+        return subprocess.Popen([RENDERER, *map(str, words)], stderr=subprocess.PIPE,
+                                preexec_fn=lambda: signal.signal(signal.SIGINT, signal.SIG_DFL))
+
     def test_an_interruption_leaves_nothing(self):
         long = self.folder / "Long.mp4"
         encode(long, 640, 360, 30, [bytes(640 * 360)] * 3000)
         self.attached(long)
-        with subprocess.Popen([RENDERER, "render", str(long), "-o", str(self.film)], stderr=subprocess.PIPE) as process:
+        with self.interruptible("render", long, "-o", self.film) as process:
             deadline = time.monotonic() + 60
             while not any(path.stat().st_size > 0 for path in self.folder.glob(".Film.*")):
                 self.assertLess(time.monotonic(), deadline, "nothing was begun")
@@ -561,7 +564,7 @@ class Outputs(Films):
         self.assertEqual(sorted(path.name for path in self.folder.iterdir()), ["Long.mp4", "Recording.mp4"])
 
     def test_frames_guides_and_images_leave_nothing_if_they_are_interrupted(self):
-        clicks = [(0.1 + i / 100, 1 + i % 2) for i in range(380)]
+        clicks = [(0.1 + i / 100, (1, 2, 4, 8)[i % 4]) for i in range(380)] # left and right in turn
         attach(self.movie, {"recordingRegion": [(0, 0, 0, 320, 240)], "cursorLocation": [(i / 25, 3 * i, 2 * i) for i in range(100)],
                             "cursorAction": clicks})
         times = ",".join(f"{i / 1000}" for i in range(4000))
@@ -569,7 +572,7 @@ class Outputs(Films):
         for words in (["guide", self.movie, "-o", self.folder / "guide"],
                       ["render", self.movie, "--frames", self.folder / "stills", "--at", times],
                       ["render", self.movie, "-o", self.folder / "Film.gif", "--gif", "--fps", "50"]):
-            with subprocess.Popen([RENDERER, *map(str, [*words, "--size", "1280x960"])], stderr=subprocess.PIPE) as process:
+            with self.interruptible(*words, "--size", "1280x960") as process:
                 deadline = time.monotonic() + 60
                 while not [path for path in self.folder.rglob("*") if path.is_file() and path.name not in before]:
                     self.assertLess(time.monotonic(), deadline, "nothing was begun")
@@ -588,6 +591,9 @@ class Outputs(Films):
         self.assertEqual(run(self.movie, "-o", self.folder / "guide", command="guide", check=False).returncode, 3)
 
     def test_other_encoders_take_a_quality(self):
+        noise = random.Random(1)
+        encode(self.movie, 160, 90, 30, [noise.randbytes(160 * 90) for _ in range(15)])
+        self.attached(self.movie)
         sizes = []
         for quality in ("2", "45"):
             done = run(self.movie, "-o", self.film, "--codec", "mpeg4", "--quality", quality, "--force")
@@ -651,17 +657,17 @@ class Outputs(Films):
 
 
 class Hostile(Films):
-    def failed(self, *words):
+    def failed(self, *words, code=1):
         done = run(*words, "-o", self.film, check=False)
-        self.assertEqual(done.returncode, 1, done.stderr)
+        self.assertEqual(done.returncode, code, done.stderr)
         self.assertFalse(self.film.exists())
         self.assertGreater(len(done.stderr.strip()), 10)
 
     def test_what_is_no_movie_is_refused(self):
         self.failed(self.folder / "absent.mp4")
-        for contents in (b"", b"x" * 100, bytes(5000)):
+        for contents, code in ((b"", 4), (b"x" * 100, 4), (bytes(5000), 1)):
             self.movie.write_bytes(contents)
-            self.failed(self.movie)
+            self.failed(self.movie, code=code)
 
     def test_a_movie_without_metadata_is_told(self):
         encode(self.movie, 160, 90, 30, [bytes(160 * 90)] * 10)
@@ -696,7 +702,7 @@ class Hostile(Films):
             for place in range(start, min(start + 4000, whole.index(b"moov") - 8), step):
                 damaged[place:place + size] = bytes(size)
             self.movie.write_bytes(damaged)
-            self.assertIn(run(self.movie, "-o", self.film, "--force", check=False).returncode, (0, 1))
+            self.assertIn(run(self.movie, "-o", self.film, "--force", check=False).returncode, (0, 1, 3))
 
     def test_a_movie_that_was_cut_off_is_told(self):
         """Half of the pictures are missing in the file, though its table has them."""
@@ -853,7 +859,7 @@ class Redaction(Films):
         encode(self.movie, 320, 240, 30, [bytes([200]) * (320 * 240)] * 120)
         attach(self.movie, {"recordingRegion": [(0, 0, 0, 320, 240)],
                             "cursorLocation": [(0, 10, 10), (1.5, 150, 110), (2.5, 160, 120), (3.5, 20, 20)],
-                            "cursorImage": [(0, 1, shown, 0, 0), (1.6, 2, hidden, 0, 0), (3.2, 1, b"", 0, 0)]})
+                            "cursorImage": [(0, 1, shown, 0, 0), (1.6, 2, hidden, 0, 0), (2.6, 1, b"", 0, 0)]})
         run(self.movie, "-o", self.film, "--redact", self.file, "--style", self.style())
         data = self.film.read_bytes()
         self.assertIn(shown, data)
@@ -948,11 +954,12 @@ class Golden(Films):
 
     def test_something_that_is_missing_is_seen(self):
         """The tolerance is tight enough: frames without a cursor, a ring or a caption are not alike."""
-        for name, at, words in (("frame-00001.200.png", "1.2", ["--cursor-size", "0.25"]),
-                                ("frame-00001.200.png", "1.2", ["--style", self.style(clicks={"show": False}, keys={})]),
-                                ("frame-00002.000.png", "2", ["--keys", "hidden"])):
+        without_rings = self.style(cursor={"size": 1, "smooth": False}, clicks={"show": False}, keys={})
+        for name, at, words in (("frame-00001.200.png", "1.2", ["--style", "plain", "--cursor-size", "0.25"]),
+                                ("frame-00001.200.png", "1.2", ["--style", without_rings]),
+                                ("frame-00002.000.png", "2", ["--style", "plain", "--keys", "hidden"])):
             stills = self.folder / "changed"
-            run(self.movie, "--frames", stills, "--at", at, "--style", "plain", "--force", *words)
+            run(self.movie, "--frames", stills, "--at", at, "--force", *words)
             with self.assertRaises(AssertionError):
                 self.assertAlike(stills / name, self.FOLDER / f"plain-{name}")
 
