@@ -15,7 +15,7 @@ for argument in "$@"; do
     esac
 done
 
-scripts/install.sh build media bench
+scripts/install.sh build media render bench
 echo "== building" >&2
 cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF -DZULM_BUILD_VIEWER=OFF >/dev/null
 cmake --build --preset release --target zulm benchmarks >&2
@@ -24,7 +24,7 @@ table=$(mktemp)
 trap 'rm -f "$table"' EXIT
 missed=0
 printf '| task | beside | measured | target | |\n|---|---|---|---|---|\n' | tee "$table"
-for benchmark in Append Session Read Recording Scan Save List Image Load Insights Retiming; do
+for benchmark in Append Session Read Recording Scan Save List Image Load Insights Retiming Render; do
     "build/release/Benchmarks/${benchmark}Benchmark" "$task" | tee -a "$table" || missed=1
 done
 [ -z "$document" ] || python3 scripts/put_table.py Docs/performance.md <"$table"
