@@ -16,7 +16,7 @@ for argument in "$@"; do
     esac
 done
 
-scripts/install.sh build media bench python many
+scripts/install.sh build media render bench python many
 echo "== building" >&2
 cmake --preset release -DZULMETADATA_BUILD_TESTS=OFF -DZULM_BUILD_VIEWER=OFF \
     -DZULMETADATA_BUILD_PYTHON=ON >/dev/null
@@ -26,7 +26,7 @@ table=$(mktemp)
 trap 'rm -f "$table"' EXIT
 missed=0
 printf '| task | beside | measured | target | |\n|---|---|---|---|---|\n' | tee "$table"
-for benchmark in Append Session Read Recording Scan Save List Image Load Insights Retiming; do
+for benchmark in Append Session Read Recording Scan Save List Image Load Insights Retiming Render; do
     "build/release/Benchmarks/${benchmark}Benchmark" "$task" | tee -a "$table" || missed=1
 done
 PYTHONPATH=build/release/Bindings/Python/package /usr/bin/python3 Benchmarks/many_recordings.py \

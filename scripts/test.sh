@@ -7,7 +7,7 @@ cd "$(dirname "$0")/.."
 preset=${1:-dev}
 
 with=()
-scripts/install.sh build media test record desktop passwords sound
+scripts/install.sh build media test record render desktop passwords sound
 [ "$preset" != dev ] || scripts/install.sh consumers python many
 case "$preset" in
     dev | release) scripts/install.sh viewer browser parquet && with=(-DZULM_BUILD_VIEWER=ON -DZULM_BUILD_PARQUET=ON) ;; # others leave it out

@@ -59,8 +59,9 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
     }
     EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "cut", "data-set", "detach",
                                                         "diff", "dump", "edits", "export", "extract", "grep", "info",
-                                                        "insights", "record", "redact", "repair", "retime", "salvage",
-                                                        "stamp", "state", "verify", "view"));
+                                                        "insights", "record", "redact", "redactions", "repair",
+                                                        "retime", "salvage", "stamp", "state", "style", "verify",
+                                                        "view", "zooms"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {

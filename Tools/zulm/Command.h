@@ -46,6 +46,8 @@ void addExportCommand(CLI::App& app, Action& chosen);
 void addConvertCommand(CLI::App& app, Action& chosen);
 void addDemoCommand(CLI::App& app, Action& chosen);
 void addRecordCommand(CLI::App& app, Action& chosen);
+void addRenderCommand(CLI::App& app, Action& chosen);
+void addGuideCommand(CLI::App& app, Action& chosen);
 
 /// One line on standard error, whatever the settings.
 void complain(const std::string& message);
