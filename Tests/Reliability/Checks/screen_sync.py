@@ -119,6 +119,7 @@ def run(context):
     with desk.Desk() as screen:
         window = screen.show(0, 0, 1280, 700)
         screen.xdotool("mousemove", 600, 400)
+        screen.run("xset", "r", "off")  # on a busy machine a key seems to be held
         recording = screen.record("--fps", "60", "--keys", "all", "--without-accessibility")
         act(screen, events, pause)
         if recording.stop() != 0:

@@ -217,7 +217,7 @@ def grey_frames(path, area):
     x, y, width, height = area
     command = ["ffmpeg", "-v", "error", "-i", str(path), "-vf", f"crop={width}:{height}:{x}:{y}", "-fps_mode",
                "passthrough", "-f", "rawvideo", "-pix_fmt", "gray", "-"]
-    with subprocess.Popen(command, stdout=subprocess.PIPE) as process:
+    with subprocess.Popen(command, stdout=subprocess.PIPE, stderr=subprocess.DEVNULL) as process:
         while len(frame := process.stdout.read(width * height)) == width * height:
             yield frame
         process.stdout.close()
