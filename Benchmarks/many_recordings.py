@@ -116,12 +116,13 @@ def scan_on_cluster(paths, workers):
     with distributed.LocalCluster(n_workers=workers, threads_per_worker=1, host="127.0.0.1",
                                   dashboard_address=None) as cluster, distributed.Client(cluster) as client:
         client.wait_for_workers(workers)
-        zulmetadata.scan(paths[:1], KIND, on_error="skip").to_dask().map_partitions(len).compute()
+        zulmetadata.scan(paths[:1], KIND, on_error="skip").to_dask().compute()
         begin = time.perf_counter()
         data, failures = zulmetadata.scan(paths, KIND, on_error="report").to_dask(partition_recordings=PARTITION)
-        result = dask.compute(data.map_partitions(len).sum(), failures.map_partitions(len).sum())
+        rows = [[dask.delayed(len)(part) for part in frame.to_delayed()] for frame in (data, failures)]
+        result = tuple(map(sum, dask.compute(*rows)))
         seconds = time.perf_counter() - begin
-        return seconds, max(client.run(peak_of_this_process).values()), tuple(map(int, result))
+        return seconds, max(client.run(peak_of_this_process).values()), result
 
 
 def export(zulm, paths, workers):
