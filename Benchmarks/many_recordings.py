@@ -13,6 +13,7 @@ import argparse
 import math
 import os
 import pathlib
+import re
 import resource
 import statistics
 import subprocess
@@ -116,12 +117,23 @@ def scan_on_cluster(paths, workers):
     with distributed.LocalCluster(n_workers=workers, threads_per_worker=1, host="127.0.0.1",
                                   dashboard_address=None) as cluster, distributed.Client(cluster) as client:
         client.wait_for_workers(workers)
-        zulmetadata.scan(paths[:1], KIND, on_error="skip").to_dask().map_partitions(len).compute()
+        zulmetadata.scan(paths[:1], KIND, on_error="skip").to_dask().compute()
         begin = time.perf_counter()
         data, failures = zulmetadata.scan(paths, KIND, on_error="report").to_dask(partition_recordings=PARTITION)
-        result = dask.compute(data.map_partitions(len).sum(), failures.map_partitions(len).sum())
+        rows = [[dask.delayed(len)(part) for part in frame.to_delayed()] for frame in (data, failures)]
+        result = tuple(map(sum, dask.compute(*rows)))
         seconds = time.perf_counter() - begin
-        return seconds, max(client.run(peak_of_this_process).values()), tuple(map(int, result))
+        return seconds, max(client.run(peak_of_this_process).values()), result
+
+
+def peak_until_end(process):
+    """Returns the most memory of a process. What the system tells about one that has ended includes its parent's."""
+    peak = 0
+    while process.poll() is None:
+        found = re.search(r"VmHWM:\s+(\d+)", pathlib.Path(f"/proc/{process.pid}/status").read_text(encoding="ascii"))
+        peak = int(found[1]) * 1024 if found else peak
+        time.sleep(0.01)
+    return peak
 
 
 def export(zulm, paths, workers):
@@ -133,12 +145,11 @@ def export(zulm, paths, workers):
         begin = time.perf_counter()
         process = subprocess.Popen([zulm, "--quiet", "export", "--files-from", names, "--jobs", str(workers), "-o",
                                     tables], stderr=subprocess.DEVNULL)
-        _, status, usage = os.wait4(process.pid, 0)
-        process.returncode = os.waitstatus_to_exitcode(status)
+        memory = peak_until_end(process)
         seconds = time.perf_counter() - begin
         with open(tables / "manifest.ndjson", encoding="utf-8") as manifest:
             lines = sum(1 for _ in manifest)
-        return seconds, usage.ru_maxrss * 1024, (lines - 1, sum(path.stat().st_size for path in tables.glob("kind=*/*")
+        return seconds, memory, (lines - 1, sum(path.stat().st_size for path in tables.glob("kind=*/*")
                                                                if path.suffix == ".csv"))
 
 
