@@ -1,5 +1,5 @@
-# What `cmake --install` puts in place, in the components Core, Bridge, Session, Tools, Viewer and Recorder. What only a program's
-# build needs of the libraries is in the components CoreDevelopment, BridgeDevelopment and SessionDevelopment.
+# What `cmake --install` puts in place, in the components Core, Bridge, Session, Tools, Viewer, Recorder and Renderer. What
+# only a program's build needs of the libraries is in the components CoreDevelopment, BridgeDevelopment and SessionDevelopment.
 include(CMakePackageConfigHelpers)
 include(GNUInstallDirs)
 
@@ -58,6 +58,9 @@ if(ZULMETADATA_BUILD_TOOLS)
 endif()
 if(ZULMETADATA_RECORDER)
   zulm_find_libraries_from(zulm-record ${CMAKE_INSTALL_FULL_BINDIR})
+endif()
+if(ZULMETADATA_RENDERER)
+  zulm_find_libraries_from(zulm-render ${CMAKE_INSTALL_FULL_BINDIR})
 endif()
 if(ZULMETADATA_BUILD_TOOLS AND ZULM_VIEWER)
   install(FILES ${PROJECT_BINARY_DIR}/Tools/viewer/viewer.html DESTINATION ${data_folder} COMPONENT Viewer)

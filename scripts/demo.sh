@@ -1,19 +1,19 @@
 #!/usr/bin/env bash
 # Records somebody who works with an editor and a terminal, on an X server without a screen. Checks that everything that
-# was clicked, typed and scrolled is in the recording, shows it, cuts it, and writes a page that plays it.
+# was clicked, typed and scrolled is in the recording, shows it, cuts it, and writes a page that plays it, and a film.
 # Usage: scripts/demo.sh [FOLDER]; everything is left in FOLDER (demo-output if none is named).
 set -euo pipefail
 cd "$(dirname "$0")/.."
 folder=${1:-demo-output}
 
-scripts/install.sh build media viewer record desktop
+scripts/install.sh build media viewer record render desktop
 
 # The build is that of scripts/test.sh, so that neither compiles again what the other has compiled.
 echo "== building"
 tests=()
 [ -f build/dev/CMakeCache.txt ] || tests=(-DZULMETADATA_BUILD_TESTS=OFF) # the packages that they need may be missing
 cmake --preset dev "${tests[@]}" -DZULM_BUILD_VIEWER=ON >/dev/null
-cmake --build --preset dev --target zulm zulm-record
+cmake --build --preset dev --target zulm zulm-record zulm-render
 zulm=build/dev/Tools/zulm/zulm
 
 mkdir -p "$folder"
@@ -59,6 +59,11 @@ echo "== writing pages that show them playing"
 "$zulm" view "$movie" -o "$folder/Recording.html" --force
 "$zulm" view "$folder/Cut.mp4" -o "$folder/Cut.html" --force
 
+echo "== making a film of it"
+"$zulm" render "$movie" -o "$folder/Film.mp4" --force
+"$zulm" verify "$folder/Film.mp4"
+
 echo
 echo "The movie is $movie, and a cut of it is $folder/Cut.mp4."
 echo "Open the pages in a browser: $folder/Recording.html, $folder/Cut.html"
+echo "The film is $folder/Film.mp4."

@@ -12,6 +12,8 @@ consumers=(clang make pkg-config binutils)
 record=(libx11-dev libxtst-dev libxcb1-dev libxcb-shm0-dev libxcb-xfixes0-dev libxcb-xinput-dev libxcb-randr0-dev libxcb-composite0-dev
     libxcb-xkb-dev libxkbcommon-dev libxkbcommon-x11-dev libavcodec-dev libavformat-dev libavutil-dev libswscale-dev
     libpulse-dev libatspi2.0-dev)
+render=(libavcodec-dev libavfilter-dev libavformat-dev libavutil-dev libswresample-dev libswscale-dev libcairo2-dev
+    libpango1.0-dev fonts-dejavu-core)
 desktop=(xvfb openbox xdotool xterm l3afpad x11-utils x11-xserver-utils x11-xkb-utils xkb-data at-spi2-core dbus ffmpeg python3)
 passwords=(python3-gi gir1.2-gtk-3.0)
 sound=(pulseaudio pulseaudio-utils)
@@ -31,8 +33,9 @@ arm64=(g++-aarch64-linux-gnu qemu-user googletest libpng-dev:arm64 libtiff-dev:a
     libutf8proc-dev:arm64)
 macos=(binutils file)
 viewer=(emscripten nodejs)
+parquet=(nodejs) # npm installs the rest, as Tools/parquet/package-lock.json says
 browser=(chromium fonts-dejavu-core fonts-inter fonts-liberation fonts-noto-color-emoji fonts-wqy-microhei)
-command -v npm >/dev/null || { macos+=(npm) viewer+=(npm); } # Node's own packages have it inside
+command -v npm >/dev/null || { macos+=(npm) viewer+=(npm) parquet+=(npm); } # Node's own packages have it inside
 
 packages=()
 for group in "$@"; do

@@ -6,9 +6,9 @@ set -euo pipefail
 cd "$(dirname "$0")/.."
 build=${BUILD:-build/package}
 
-scripts/install.sh build viewer record package
+scripts/install.sh build viewer record render package
 cmake --preset release -B "$build" -DCMAKE_INSTALL_PREFIX=/usr -DBUILD_SHARED_LIBS=ON -DZULM_BUILD_VIEWER=ON \
-    -DZULMETADATA_BUILD_RECORDER=ON "$@" >/dev/null
+    -DZULMETADATA_BUILD_RECORDER=ON -DZULMETADATA_BUILD_RENDERER=ON "$@" >/dev/null
 cmake --build "$build"
 rm -rf "$build/packages"
 (cd "$build" && cpack -B packages >/dev/null)

@@ -133,7 +133,8 @@ export class Recording {
    *
    * Captions have one row for each key: `label`, its text; `is_typed`, 1 for a character without modifiers, which makes
    * words with its neighbours; `first`, the row that begins its caption; `end`, until when its caption is shown. Unless
-   * `shows_keys` is true, a bullet takes the place of what was typed.
+   * `shows_keys` is true, a bullet takes the place of what was typed; `shows_shortcuts` shows characters with Control,
+   * Windows or Command nevertheless.
    */
   insights(
     name: 'clicks' | 'captions' | 'idle' | 'chapters' | 'zooms' | 'cursor_path' | 'camera' | 'activity' | 'applications',

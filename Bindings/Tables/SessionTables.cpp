@@ -331,6 +331,7 @@ const std::vector<InsightTable>& insightTables() {
          clickRows},
         {"captions",
          {{"shows_keys", setOption<&Options::captions, &KeyCaptionOptions::showsKeys>},
+          {"shows_shortcuts", setOption<&Options::captions, &KeyCaptionOptions::showsShortcuts>},
           {"pause", setOption<&Options::captions, &KeyCaptionOptions::pause>},
           {"hold", setOption<&Options::captions, &KeyCaptionOptions::hold>},
           {"line_length", setOption<&Options::captions, &KeyCaptionOptions::lineLength>}},

@@ -167,7 +167,11 @@ TEST_F(CInterface, ReturnsKeysAsCaptionsShowThem) {
     EXPECT_THAT(valuesOf<std::int32_t>(shown.get(), 2), testing::ElementsAre(0, 0, 0, 3));
     EXPECT_STREQ(zulm_column(shown.get(), 3)->name, "end");
     EXPECT_THAT(valuesOf<double>(shown.get(), 3), testing::ElementsAre(3, 3, 3, 6.5));
+    const ReadEntries shortcuts(zulm_insight(recording.get(), "captions", "shows_shortcuts=1"));
+    EXPECT_EQ(textOf(shortcuts.get(), 0, 0), "\xe2\x80\xa2");
+    EXPECT_EQ(textOf(shortcuts.get(), 0, 2), "\xe2\x8c\x98S");
     const ReadEntries masked(zulm_insight(recording.get(), "captions", nullptr));
+    EXPECT_EQ(textOf(masked.get(), 0, 2), "\xe2\x8c\x98\xe2\x80\xa2");
     EXPECT_EQ(textOf(masked.get(), 0, 0), "\xe2\x80\xa2");
     EXPECT_EQ(textOf(masked.get(), 0, 3), "[returnKey]");
 }

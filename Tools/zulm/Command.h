@@ -42,9 +42,12 @@ void addRetimeCommand(CLI::App& app, Action& chosen);
 void addRedactCommand(CLI::App& app, Action& chosen);
 void addExtractCommand(CLI::App& app, Action& chosen);
 void addSalvageCommand(CLI::App& app, Action& chosen);
+void addExportCommand(CLI::App& app, Action& chosen);
 void addConvertCommand(CLI::App& app, Action& chosen);
 void addDemoCommand(CLI::App& app, Action& chosen);
 void addRecordCommand(CLI::App& app, Action& chosen);
+void addRenderCommand(CLI::App& app, Action& chosen);
+void addGuideCommand(CLI::App& app, Action& chosen);
 
 /// One line on standard error, whatever the settings.
 void complain(const std::string& message);

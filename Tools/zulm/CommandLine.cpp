@@ -3,8 +3,8 @@
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/Help.h"
 #include "Tools/zulm/Manual.h"
-#include "Tools/zulm/RecordCommand.h"
 #include "Tools/zulm/Settings.h"
+#include "Tools/zulm/SisterProgram.h"
 #include "Tools/zulm/StandardStreams.h"
 
 #include <fmt/core.h>
@@ -36,7 +36,8 @@ const std::vector<CommandGroup> s_commandGroups{
     {"Change",
      {addAttachCommand, addStampCommand, addRetimeCommand, addCutCommand, addRedactCommand, addCompactCommand,
       addDetachCommand}},
-    {"Convert", {addExtractCommand, addConvertCommand}},
+    {"Convert", {addExtractCommand, addConvertCommand, addExportCommand}},
+    {"Show", {addRenderCommand, addGuideCommand}},
     {"Try", {addDemoCommand}}};
 
 std::vector<std::string> commandNames(const CLI::App& app) {
@@ -222,8 +223,8 @@ ExitCode runCommandLine(int argc, char** argv) {
                  "zulm");
     Action chosen;
     std::string format;
-    if (argc > 1 && std::string_view(argv[1]) == s_recordCommand) // whose options are its own, --help and --json too
-        return becomeRecorder({argv + 2, argv + argc});
+    if (const SisterProgram* sister = argc > 1 ? sisterProgramOf(argv[1]) : nullptr)
+        return become(*sister, {argv + 2, argv + argc});
     define(app, chosen);
     app.add_option("--generate", format)->group("");
     try {

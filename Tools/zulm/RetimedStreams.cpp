@@ -10,10 +10,12 @@
 
 #include <fmt/core.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cmath>
 #include <cstring>
 #include <fstream>
+#include <utility>
 
 namespace Zulm {
 
@@ -56,6 +58,17 @@ RetimedStreams::RetimedStreams(const Recording& recording, const EditList& edits
 }
 
 RetimedStreams::~RetimedStreams() = default;
+
+void RetimedStreams::replace(const uuid& kind, std::string bytes) {
+    auto found = std::find_if(edited_.streams.begin(), edited_.streams.end(),
+                              [&kind](const EditedStream& stream) { return stream.source.type == kind; });
+    if (found == edited_.streams.end())
+        found = edited_.streams.insert(found, EditedStream{});
+    found->source.type = kind;
+    found->isCopied = true;
+    found->bytes = ByteSource::memory(replacements_.emplace_back(std::move(bytes)));
+    found->size = found->bytes.size();
+}
 
 std::vector<StreamSource> RetimedStreams::sources() const {
     std::vector<StreamSource> sources;

@@ -8,6 +8,7 @@
 
 #include <nlohmann/json.hpp>
 
+#include <list>
 #include <memory>
 #include <string>
 #include <vector>
@@ -28,6 +29,11 @@ public:
     ~RetimedStreams();
     RetimedStreams(const RetimedStreams&) = delete;
     RetimedStreams& operator=(const RetimedStreams&) = delete;
+
+    const ZULMetaData::EditedRecording& edited() const { return edited_; }
+
+    /// Takes these bytes, header included, as the stream of a kind, whether or not the recording has one.
+    void replace(const ZULMetaData::uuid& kind, std::string bytes);
 
     /// What is attached.
     std::vector<ZULMetaData::StreamSource> sources() const;
@@ -51,6 +57,7 @@ private:
     std::string name_; ///< of the recording
     std::unique_ptr<TemporaryFile> file_;
     ZULMetaData::EditedRecording edited_;
+    std::list<std::string> replacements_; ///< which stay where they are
 };
 
 /// Warns if a movie's length is not that of the edits.

@@ -28,6 +28,13 @@ bool makeShortcut(Modifiers modifiers) {
     return !modifiers.empty();
 }
 
+/// Returns whether modifiers keep a key from typing a character. Alt types the third sign of a key on many keyboards, and
+/// so does Control with Alt.
+bool keepFromTyping(Modifiers modifiers) {
+    const bool hasCommand = modifiers.contains(Modifier::Command) || modifiers.contains(Modifier::Windows);
+    return hasCommand || (modifiers.contains(Modifier::Control) && !modifiers.contains(Modifier::Alt));
+}
+
 bool makeUpperCase(Modifiers modifiers) {
     return modifiers.contains(Modifier::Shift) != modifiers.contains(Modifier::CapsLock);
 }
@@ -76,11 +83,12 @@ KeyName captionNameOf(const KeyInput& key) {
     return keyNameOf({key.code, key.isVirtualKey ? s_virtualKeyFlag : 0});
 }
 
-CaptionKey captionKey(double time, const KeyInput& key, const KeyName& name, bool showsKeys) {
+CaptionKey captionKey(double time, const KeyInput& key, const KeyName& name, const KeyCaptionOptions& options) {
     const std::string typed = typedBy(key, name);
     if (typed.empty())
         return {time, signsOf(key.modifiers) + "[" + name.text + "]", false};
-    const std::string shown = showsKeys ? typed : s_mask;
+    const bool isShown = options.showsKeys || (options.showsShortcuts && keepFromTyping(key.modifiers));
+    const std::string shown = isShown ? typed : s_mask;
     if (makeShortcut(key.modifiers))
         return {time, signsOf(key.modifiers) + shown, false};
     return {time, shown, true};
@@ -106,7 +114,7 @@ std::vector<KeyCaption> keyCaptions(const Track<KeyboardActionKind>& keys, const
     for (std::size_t i = 0; i < keys.size(); ++i) {
         const double time = keys.times()[i];
         const KeyName name = captionNameOf(keys.values()[i]);
-        CaptionKey key = captionKey(time, keys.values()[i], name, options.showsKeys);
+        CaptionKey key = captionKey(time, keys.values()[i], name, options);
         const bool isSeparate = !captions.empty() && !(key.isTyped && captions.back().keys.back().isTyped);
         const std::size_t added = lengthOf(key.label) + (isSeparate ? 1 : 0);
         const bool isNew = isLineEnded || time - captions.back().keys.back().time >= options.pause ||

@@ -20,6 +20,9 @@ struct KeyCaptionOptions {
     /// If false, every key that types a character shows as a bullet, and so does a number without a name: only virtual
     /// keys that type nothing, and control characters, show by their names.
     bool showsKeys = false;
+    /// If true, a character with Control, Windows or Command shows although `showsKeys` is false. With Alt alone, and
+    /// with Control and Alt, it stays a bullet: keyboards type letters of passwords with these modifiers.
+    bool showsShortcuts = false;
     double pause = 1;            ///< seconds between two keys that end a caption
     double hold = 1.5;           ///< seconds that a caption stays after its last key
     std::size_t lineLength = 42; ///< characters in a caption, at most, unless a single key has more

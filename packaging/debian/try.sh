@@ -23,11 +23,18 @@ cat refused.txt >>printed.txt
 [ ! -e Screen.mp4.recording ]
 zulm record --help | grep -q -e --recover
 ls /usr/share/man/man1/zulm-record.1* >/dev/null
+zulm render --help | grep -q -e --remove-idle
+if zulm render Movie.mp4 -o Film.mp4 2>refused.txt || [ $? -ne 1 ]; then
+    echo "zulm render is not refused without pictures" >&2
+    exit 1
+fi
+cat refused.txt >>printed.txt
+[ ! -e Film.mp4 ]
 grep -qx 'at 0.5 s the cursor is at (640,360)' printed.txt
 grep -qx 'on top: Editor' printed.txt
 grep -q '^ *cursorLocation .* 2 ' printed.txt
 
-apt-get purge -y -qq zulm-record zulm-tools libzulmetadata-dev libzulmetadata1 >/dev/null
+apt-get purge -y -qq zulm-record zulm-render zulm-tools libzulmetadata-dev libzulmetadata1 >/dev/null
 if find /usr -iname '*zulm*' | grep .; then
     echo "the packages leave files behind" >&2
     exit 1

@@ -101,6 +101,20 @@ TEST(KeyCaptions, MaskWhatWasTypedAndNoOtherKeys) {
     EXPECT_EQ(maskedLabel(s_up, s_virtualKey), "[up]");
 }
 
+TEST(KeyCaptions, ShowCharactersOfShortcutsIfAsked) {
+    const auto shortcut = [](std::uint32_t code, std::uint32_t flags) {
+        KeyCaptionOptions options;
+        options.showsShortcuts = true;
+        return keyCaptions(keys({{1, {code, flags}}}), options).at(0).text;
+    };
+    EXPECT_EQ(shortcut('S', s_virtualKey | s_control), "\xe2\x8c\x83S");
+    EXPECT_EQ(shortcut('S', s_virtualKey | s_shift | s_command), "\xe2\x87\xa7\xe2\x8c\x98S");
+    EXPECT_EQ(shortcut('A', s_virtualKey), s_bullet);
+    EXPECT_EQ(shortcut('A', s_virtualKey | s_shift), s_bullet);
+    EXPECT_EQ(shortcut('@', s_alt), "\xe2\x8c\xa5" + s_bullet) << "it may be a letter of a password";
+    EXPECT_EQ(shortcut('@', s_control | s_alt), "\xe2\x8c\x83\xe2\x8c\xa5" + s_bullet);
+}
+
 TEST(KeyCaptions, MaskEveryKeyThatTypesACharacter) {
     for (std::uint32_t code = 0; code < 0x180; ++code) {
         const bool isNamed = (code >= 3 && code <= 47 && code != 32) || (code >= 112 && code <= 145) || code == 0;
