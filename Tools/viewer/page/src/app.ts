@@ -183,13 +183,16 @@ export class App implements Page {
     this.stage.zoom.reset();
     this.selectionChanged();
     void this.followLink();
-    this.frame();
-    mark('zulm:first-picture');
-    void this.showDetails(session, () => {
+    void this.showDetails(session, this.firstPicture, () => {
       this.entries.show(session);
       this.followLinkToEntries();
     });
   }
+
+  private firstPicture = (): void => {
+    this.frame();
+    mark('zulm:first-picture');
+  };
 
   private loadMovie(session: Session): void {
     const canHavePictures = session.container !== 'stream' || this.movie.isAnother;
@@ -229,10 +232,10 @@ export class App implements Page {
     this.address.write();
   }
 
-  /// Shows what may come after the first picture, one part at a time.
-  private async showDetails(session: Session, showEntries: () => void): Promise<void> {
+  /// Shows one part at a time: `first`, and what may come after it.
+  private async showDetails(session: Session, ...first: (() => void)[]): Promise<void> {
     const parts = [
-      showEntries,
+      ...first,
       () => this.tellFacts(session),
       () => showCheck(session, this.player.size),
       () => this.requestFrame(),
