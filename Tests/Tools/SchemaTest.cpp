@@ -56,11 +56,10 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         EXPECT_EQ(file.path().filename(), name + ".schema.json");
         commands.push_back(name.substr(5));
     }
-    EXPECT_THAT(commands,
-                testing::UnorderedElementsAre("atoms", "attach", "compact", "cut", "detach", "diff", "dump", "edits",
-                                              "extract", "grep", "info", "insights", "record", "redact", "redactions",
-                                              "repair", "retime", "salvage", "stamp", "state", "style", "verify",
-                                              "view", "zooms"));
+    EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "cut", "detach", "diff", "dump",
+                                                        "edits", "extract", "grep", "info", "insights", "record",
+                                                        "redact", "redactions", "repair", "retime", "salvage", "stamp",
+                                                        "state", "style", "verify", "view", "zooms"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
