@@ -54,6 +54,8 @@ const std::vector<Words> s_commands{
     {"stamp", "FILE", "--in-place", "--creator", "c", "--creator-version", "1"},
     {"retime", "FILE", "--movie", "MOVIE", "-o", "DIR/out.mp4", "--force", "--keep", "0-2", "--keep", "1-5@3/2"},
     {"retime", "FILE", "--movie", "FILE", "-o", "DIR/out.mp4", "--force", "--remove", "1-2", "--replace", "--json"},
+    {"export", "FILE", "-o", "DIR/tables", "--quiet"},
+    {"export", "FILE", "-o", "DIR/tables", "--format", "ndjson", "--json"},
 };
 
 std::string replaced(std::string word, const std::string& name, const std::string& value) {
@@ -90,6 +92,6 @@ void runTarget(std::string_view bytes) {
         Fuzz::fail("an exit code that this command line cannot have");
     if (Fuzz::hasRefusedMemory())
         Fuzz::fail("much memory");
-    for (const char* folder : {"/images", "/salvaged", "/extracted"})
+    for (const char* folder : {"/images", "/salvaged", "/extracted", "/tables"})
         std::filesystem::remove_all(Fuzz::folder() + folder);
 }

@@ -33,8 +33,9 @@ arm64=(g++-aarch64-linux-gnu qemu-user googletest libpng-dev:arm64 libtiff-dev:a
     libutf8proc-dev:arm64)
 macos=(binutils file)
 viewer=(emscripten nodejs)
+parquet=(nodejs) # npm installs the rest, as Tools/parquet/package-lock.json says
 browser=(chromium fonts-dejavu-core fonts-inter fonts-liberation fonts-noto-color-emoji fonts-wqy-microhei)
-command -v npm >/dev/null || { macos+=(npm) viewer+=(npm); } # Node's own packages have it inside
+command -v npm >/dev/null || { macos+=(npm) viewer+=(npm) parquet+=(npm); } # Node's own packages have it inside
 
 packages=()
 for group in "$@"; do

@@ -148,12 +148,14 @@ py::list coordinatesOf(const std::string& kind) {
 }
 
 py::array readEntries(const StreamSource& source) {
-    const ByteSource stream = source.open();
+    return readEntries(source.open(), source.name());
+}
+
+py::array readEntries(const ByteSource& stream, const std::string& name) {
     const std::optional<MetaDataHeader> header = StreamEntries(stream).header();
     if (!header || !isDecodable(*header))
-        throwValueError(source.name() +
-                        ": the entries cannot be decoded: the version of the stream is not known, or its "
-                        "header does not state the entry size of its kind");
+        throwValueError(name + ": the entries cannot be decoded: the version of the stream is not known, or its "
+                               "header does not state the entry size of its kind");
     py::array array;
     RecordedKinds::visit(header->uuid, [&]<class Kind>() { array = entriesOfKind<Kind>(stream); });
     return array;

@@ -2,6 +2,7 @@
 
 // The entries of a stream as one NumPy array: a record for each, its fields named as the keys of an `EntryDictionary`.
 
+#include "ZULMetaData/ByteSource.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
 #include "ZULMetaDataBridge/Source/StreamSource.h"
 
@@ -28,6 +29,9 @@ py::list coordinatesOf(const std::string& kind);
 /// Returns every whole entry that fits the kind. Numbers are not copied after they are read: the array keeps that
 /// memory. Texts are whole; bytes in them that are not UTF-8 become lone surrogates. Throws `ValueError` for a stream
 /// whose version is not known.
+///@{
 py::array readEntries(const StreamSource& stream);
+py::array readEntries(const ByteSource& stream, const std::string& name);
+///@}
 
 } // namespace ZULMetaData::Python

@@ -64,6 +64,16 @@ RecordingSummary lookInto(const FileLocation& file) {
     return found;
 }
 
+/// Looks for one stream and for nothing else, because a scan of many recordings opens each of them for it.
+py::object readKind(const FileLocation& file, const std::string& kind) {
+    const uuid type = kindNamed(kind).type;
+    const RecordingFile recording = openRecording(file);
+    for (const StreamInfo& stream : recording.streams())
+        if (stream.type == type)
+            return readEntries(recording.bytesOf(stream), recording.name());
+    return py::none();
+}
+
 py::bytes bytesOf(const RecordedStream& stream) {
     std::string bytes;
     {
@@ -221,6 +231,8 @@ std::string keyText(std::uint32_t code, std::uint32_t flags) {
 }
 
 void addKinds(py::module_& module) {
+    module.def("read_kind", readKind, py::arg("path"), py::arg("kind"),
+               "Returns the entries of one kind in a recording, or None if it has none.");
     module.def("dtype_of", typeOfEntries, py::arg("kind"),
                "Returns the fields of an entry of this kind. Raises `KeyError` for a kind without entries.");
     module.def("coordinates_of", coordinatesOf, py::arg("kind"));

@@ -5,8 +5,9 @@ immediately, it is what the block must print. C++ without a `main` becomes the b
 
     blocks.py cpp PAGE OUTPUT    writes a program that runs the block at the line that is its argument
     blocks.py cmake PAGE PREFIX COMPILER    builds a program with each block of CMake and the library in PREFIX
-    blocks.py run PAGE PROGRAM ZULM PYTHONPATH VIEWER    runs every block in its own folder of recordings. Skips Python
-        if PYTHONPATH is empty, and `zulm view` if VIEWER is 0
+    blocks.py run PAGE PROGRAM ZULM PYTHONPATH VIEWER DUCKDB    runs every block in its own folder of recordings. Skips
+        Python if PYTHONPATH is empty, `zulm view` if VIEWER is 0, and Parquet if DUCKDB, the folder of Node's modules,
+        is empty. Blocks for Node are those that ask for DuckDB; other JavaScript is for browsers, and is not run
 """
 
 import os
@@ -33,6 +34,10 @@ class Block:
         self.printed = None
 
 
+def is_for_node(block):
+    return block.language == "js" and "@duckdb" in block.code
+
+
 def blocks_of(page):
     text = page.read_text(encoding="utf-8")
     blocks = []
@@ -41,7 +46,7 @@ def blocks_of(page):
         block = Block(found[1], found[2], text.count("\n", 0, found.start()) + 1)
         if block.language == "text" and blocks and text[end_of_last:found.start()].strip() == "":
             blocks[-1].printed = block.code
-        elif block.language in TESTED:
+        elif block.language in TESTED or is_for_node(block):
             blocks.append(block)
         elif block.language not in OTHERS and page.name != "tool.md":  # its lines of usage are not commands
             sys.exit(f"{page}:{block.line}: this block names no known language")
@@ -125,7 +130,7 @@ def run_shell(block, folder, environment, has_viewer):
             if script.startswith("scripts/") and not os.access(ROOT / script, os.X_OK):
                 return f"{script} is not a script", printed
             continue
-        if "zulm view" in command and not has_viewer:
+        if "zulm view" in command and not has_viewer or "parquet" in command and not environment["NODE_PATH"]:
             continue
         for output in re.findall(r"-o (\S+)", command):
             shutil.rmtree(folder / output, ignore_errors=True)
@@ -144,13 +149,13 @@ def run_program(command, folder, environment):
     return complaint, ended.stdout
 
 
-def run(page, program, zulm, python_path, viewer):
+def run(page, program, zulm, python_path, viewer, duckdb):
     has_viewer = viewer == "1"
     environment = os.environ | {"PATH": f"{pathlib.Path(zulm).parent}:{os.environ['PATH']}", "PYTHONPATH": python_path,
-                                "LC_ALL": "C.UTF-8"}
+                                "NODE_PATH": duckdb, "LC_ALL": "C.UTF-8"}
     failures = ran = 0
     for block in blocks_of(page):
-        if block.language == "python" and not python_path:
+        if block.language == "python" and not python_path or is_for_node(block) and not duckdb:
             continue
         with tempfile.TemporaryDirectory() as folder:
             folder = pathlib.Path(folder)
@@ -159,6 +164,8 @@ def run(page, program, zulm, python_path, viewer):
                 complaint, printed = run_program([program, str(block.line)], folder, environment)
             elif block.language == "python":
                 complaint, printed = run_program(["/usr/bin/python3", "-c", block.code], folder, environment)
+            elif block.language == "js":
+                complaint, printed = run_program(["node", "-e", block.code], folder, environment)
             else:
                 complaint, printed = run_shell(block, folder, environment, has_viewer)
         if complaint is None and block.printed is not None and printed != block.printed:

@@ -7,6 +7,7 @@
 #include <nlohmann/json.hpp>
 
 #include <filesystem>
+#include <sstream>
 
 namespace ZULMetaData::Test {
 namespace {
@@ -56,10 +57,10 @@ TEST_F(Schema, IsOneForEveryCommandThatReports) {
         EXPECT_EQ(file.path().filename(), name + ".schema.json");
         commands.push_back(name.substr(5));
     }
-    EXPECT_THAT(commands, testing::UnorderedElementsAre("atoms", "attach", "compact", "cut", "detach", "diff", "dump",
-                                                        "edits", "extract", "grep", "info", "insights", "record",
-                                                        "redact", "redactions", "repair", "retime", "salvage", "stamp",
-                                                        "state", "style", "verify", "view", "zooms"));
+    EXPECT_THAT(commands, testing::UnorderedElementsAre(
+                              "atoms", "attach", "compact", "cut", "data-set", "detach", "diff", "dump", "edits",
+                              "export", "extract", "grep", "info", "insights", "record", "redact", "redactions",
+                              "repair", "retime", "salvage", "stamp", "state", "style", "verify", "view", "zooms"));
 }
 
 TEST_F(Schema, RefusesWhatIsNotInIt) {
@@ -124,6 +125,19 @@ TEST_F(Schema, HoldsForDiff) {
 TEST_F(Schema, HoldsForGrep) {
     expectValid(
         {outputOf({"grep", "e", movie(), streamFile("slideText")}), outputOf({"grep", "nowhere at all", movie()})});
+}
+
+TEST_F(Schema, HoldsForExport) {
+    const std::string tables = folder / "Tables";
+    const std::string odds = written("na\xff.dat", locations());
+    expectValid(
+        {outputOf({"export", "-o", tables, movie(), odds}), outputOf({"export", "-o", tables, odds, torn(), odd()})});
+    std::vector<std::string> lines;
+    std::istringstream manifest(contentsOf(tables + "/manifest.ndjson"));
+    for (std::string line; std::getline(manifest, line);)
+        lines.push_back(line);
+    EXPECT_EQ(lines.size(), 5U);
+    expectValid(lines);
 }
 
 TEST_F(Schema, HoldsForInsights) {

@@ -25,6 +25,7 @@ zulm_add_tests(ToolsTests
   DemoCommandTest
   DiffCommandTest
   DumpCommandTest
+  ExportCommandTest
   ExtractCommandTest
   GrepCommandTest
   InfoCommandTest
@@ -47,8 +48,12 @@ target_link_libraries(ToolsTests PRIVATE
   ZULMetaDataToolTestSupport ZULMetaDataInvalidCorpus zulm_commands nlohmann_json::nlohmann_json)
 target_compile_definitions(ToolsTests PRIVATE
   ZULM_PATH="${ZULM_PATH}"
+  ZULM_DUCKDB="$<$<BOOL:${ZULM_BUILD_PARQUET}>:${PROJECT_BINARY_DIR}/Tools/parquet/node_modules>"
   ZULM_DOCS="${PROJECT_SOURCE_DIR}/Docs"
   ZULM_TEST_DATA="${CMAKE_CURRENT_SOURCE_DIR}/Data"
   ZULM_HAS_PAGE=$<BOOL:${ZULM_VIEWER}>)
 add_dependencies(ToolsTests zulm)
+if(TARGET zulm_parquet)
+  add_dependencies(ToolsTests zulm_parquet)
+endif()
 include(${CMAKE_CURRENT_LIST_DIR}/record/Tests.cmake)

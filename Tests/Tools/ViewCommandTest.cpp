@@ -216,7 +216,20 @@ TEST_F(ViewCommand, LeavesNothingBehindWhereThePageCannotBeWritten) {
     writeFile(page(), "no page");
     const ToolResult result = view(movie());
     EXPECT_EQ(result.exitCode, 1);
-    EXPECT_EQ(result.errors, "zulm: " + page() + ": is no page: it holds no </head>\n");
+    EXPECT_EQ(result.errors, "zulm: " + page() +
+                                 ": is not a page of the viewer, since it has no </head>; "
+                                 "name the page that zulm was built with\n");
+    EXPECT_FALSE(std::filesystem::exists(output()));
+}
+
+TEST_F(ViewCommand, RefusesAPageThatHoldsARecording) {
+    ASSERT_EQ(view(movie()).exitCode, 0);
+    std::filesystem::rename(output(), page());
+    const ToolResult result = view(movie());
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_EQ(result.errors, "zulm: " + page() +
+                                 ": holds a recording already; name the page that zulm was built with, "
+                                 "or leave out --page\n");
     EXPECT_FALSE(std::filesystem::exists(output()));
 }
 

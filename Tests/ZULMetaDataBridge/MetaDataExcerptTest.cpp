@@ -2,6 +2,7 @@
 
 #include "Tests/Support/Bytes.h"
 #include "Tests/ZULMetaData/Containers/ContainerBytes.h"
+#include "ZULMetaData/Containers/MovieDuration.h"
 #include "ZULMetaData/Containers/RecordingInfo.h"
 
 #include <gmock/gmock.h>
@@ -58,6 +59,28 @@ TEST(MetaDataExcerpt, IsReadLikeItsRecording) {
     Opened excerpt(metaDataExcerpt(original.parser()), MetaDataParser::QuickTime);
     EXPECT_EQ(original.streams().size(), 2U);
     EXPECT_EQ(excerpt.streams(), original.streams());
+}
+
+std::string movieHeader(std::uint32_t timescale, std::uint32_t duration) {
+    return atom("moov",
+                atom("mvhd", be32(0) + be32(0) + be32(0) + be32(timescale) + be32(duration) + std::string(80, '\0')) +
+                    atom("udta", "about the movie"));
+}
+
+TEST(MetaDataExcerpt, TellsHowLongTheMovieIs) {
+    const std::string movie = s_type + atom("mdat", "pictures") + movieHeader(600, 20020) + s_metaData;
+    const std::string excerpt = excerptOf(movie, MetaDataParser::QuickTime);
+    const auto duration = movieDuration(ByteSource::memory(excerpt), Container::QuickTime);
+    ASSERT_TRUE(duration);
+    EXPECT_NEAR(*duration, 20020.0 / 600, 1e-9);
+    EXPECT_EQ(excerpt.substr(0, s_type.size()), s_type);
+    EXPECT_EQ(excerpt.substr(excerpt.size() - s_metaData.size()), s_metaData);
+    EXPECT_THAT(excerpt, testing::Not(testing::HasSubstr("about the movie")));
+}
+
+TEST(MetaDataExcerpt, TellsNoDurationThatTheMovieDoesNotTell) {
+    const std::string movie = s_type + movieHeader(0, 20020) + s_metaData;
+    EXPECT_EQ(excerptOf(movie, MetaDataParser::QuickTime), s_type + s_metaData);
 }
 
 TEST(MetaDataExcerpt, KeepsWhatTheFileHoldsOfAnAtomThatIsCutShort) {

@@ -13,12 +13,11 @@
 #include <csignal>
 #include <cstdlib>
 #include <sstream>
+#include <utility>
 
 namespace Recorder {
 
 namespace {
-
-constexpr Instant s_longestAnswer = 2 * s_second;
 
 Focus focusOf(const std::string& word) {
     return word == "ordinary" ? Focus::Ordinary : word == "password" ? Focus::Password : Focus::Unknown;
@@ -26,8 +25,9 @@ Focus focusOf(const std::string& word) {
 
 /// What runs in the child until it becomes the program again.
 [[noreturn]] void becomeWatcher(int input, int output, const std::string& display) {
-    dup2(input, STDIN_FILENO);
-    dup2(output, STDOUT_FILENO);
+    // If the recorder was started without standard input, these numbers may be those that they replace.
+    dup2(fcntl(input, F_DUPFD_CLOEXEC, STDERR_FILENO + 1), STDIN_FILENO);
+    dup2(fcntl(output, F_DUPFD_CLOEXEC, STDERR_FILENO + 1), STDOUT_FILENO);
     const FileHandle nowhere(open("/dev/null", O_WRONLY | O_CLOEXEC)); // the libraries complain of buses
     dup2(nowhere.get(), STDERR_FILENO);
     sigset_t none;
@@ -95,53 +95,51 @@ bool AccessibilityProcess::readLines(const std::function<void(const std::string&
     return true;
 }
 
-bool AccessibilityProcess::waitUntilReady(Instant until) {
-    bool isReady = false;
-    bool isAbsent = !isAlive();
-    while (!isReady && !isAbsent && now() < until) {
+void AccessibilityProcess::waitUntilReady(Instant until) {
+    const AccessibilityEvents nothing{[](auto...) {}, [](auto...) {}, [](auto...) {}};
+    while (isAlive() && !isReady_ && now() < until) {
         pollfd wait{output_.get(), POLLIN, 0};
         poll(&wait, 1, static_cast<int>(std::max<Instant>(1, (until - now()) / s_millisecond)));
-        const bool goesOn = readLines([&](const std::string& line) {
-            isReady = isReady || line == "ready";
-            isAbsent = isAbsent || line == "absent";
-        });
-        isAbsent = isAbsent || !goesOn;
+        serve(nothing);
     }
-    if (!isReady)
-        end();
-    return isReady;
+}
+
+void AccessibilityProcess::take(const std::string& line, const AccessibilityEvents& events) {
+    std::istringstream words(line);
+    std::string what;
+    words >> what;
+    std::uint32_t process = 0;
+    std::string focus;
+    Area area;
+    if (what == "ready") {
+        isReady_ = true;
+    } else if (what == "absent") {
+        isAbsent_ = true;
+    } else if (what == "focus") {
+        if (words >> process >> focus)
+            events.focus(process, focusOf(focus));
+    } else if (what == "answer" && asked_) {
+        words >> focus;
+        const Instant asked = *std::exchange(asked_, std::nullopt);
+        if (askedWindow_ == windows_)
+            events.answer(asked, focusOf(focus));
+    } else if (what == "rect" && askedHover_) {
+        askedHover_.reset();
+        const bool isKnown = static_cast<bool>(words >> area.x >> area.y >> area.width >> area.height);
+        if (hoverWindow_ == windows_)
+            events.hover(isKnown ? std::optional(area) : std::nullopt);
+    }
+}
+
+bool AccessibilityProcess::hangs() const {
+    const auto isLate = [](const std::optional<Instant>& asked) { return asked && now() > *asked + s_longestAnswer; };
+    return isLate(asked_) || isLate(askedHover_);
 }
 
 void AccessibilityProcess::serve(const AccessibilityEvents& events) {
-    const bool goesOn = isAlive() && readLines([&](const std::string& line) {
-                            std::istringstream words(line);
-                            std::string what;
-                            words >> what;
-                            if (what == "focus") {
-                                std::uint32_t process = 0;
-                                std::string focus;
-                                if (words >> process >> focus)
-                                    events.focus(process, focusOf(focus));
-                            } else if (what == "answer" && asked_) {
-                                std::string focus;
-                                words >> focus;
-                                const Instant asked = *asked_;
-                                asked_.reset();
-                                if (askedWindow_ == windows_)
-                                    events.answer(asked, focusOf(focus));
-                            } else if (what == "rect") {
-                                Area area;
-                                isHovering_ = false;
-                                const bool isKnown =
-                                    static_cast<bool>(words >> area.x >> area.y >> area.width >> area.height);
-                                events.hover(isKnown ? std::optional(area) : std::nullopt);
-                            }
-                        });
-    const bool hangs = asked_ && now() > *asked_ + s_longestAnswer;
-    if (goesOn && !hangs)
-        return;
-    end();
-    events.gone();
+    const bool goesOn = isAlive() && readLines([&](const std::string& line) { take(line, events); });
+    if (!goesOn || isAbsent_ || hangs())
+        end();
 }
 
 void AccessibilityProcess::send(const std::string& line) {
@@ -156,7 +154,7 @@ void AccessibilityProcess::windowChanged(std::uint32_t process) {
 
 void AccessibilityProcess::ask(Instant interval) {
     const Instant instant = now();
-    if (asked_ || !isAlive() || instant < lastAsked_ + interval)
+    if (asked_ || !isReady_ || !isAlive() || instant < lastAsked_ + interval)
         return;
     asked_ = lastAsked_ = instant;
     askedWindow_ = windows_;
@@ -164,9 +162,10 @@ void AccessibilityProcess::ask(Instant interval) {
 }
 
 bool AccessibilityProcess::askHover(Position pointer) {
-    if (isHovering_ || !isAlive())
+    if (askedHover_ || !isReady_ || !isAlive())
         return false;
-    isHovering_ = true;
+    askedHover_ = now();
+    hoverWindow_ = windows_;
     send(fmt::format("hover {} {}\n", pointer.x, pointer.y));
     return true;
 }

@@ -16,12 +16,11 @@
 
 namespace Recorder {
 
-/// What the process tells.
+/// What the process reports.
 struct AccessibilityEvents {
     std::function<void(std::uint32_t process, Focus focus)> focus; ///< of an application has changed
     std::function<void(Instant asked, Focus focus)> answer;        ///< to a question about the focus
     std::function<void(const std::optional<Area>& area)> hover;    ///< what the pointer is over, if the bus knows
-    std::function<void()> gone;                                    ///< nothing more comes
 };
 
 class AccessibilityProcess {
@@ -32,16 +31,22 @@ public:
     AccessibilityProcess(const AccessibilityProcess&) = delete;
     AccessibilityProcess& operator=(const AccessibilityProcess&) = delete;
 
-    /// Waits for the process to reach the bus. Returns false if there is none, or if that takes too long.
-    bool waitUntilReady(Instant until);
+    /// Waits for the process to reach the bus, or to end because there is none.
+    void waitUntilReady(Instant until);
+
+    /// Returns whether the process has reached the bus.
+    bool isReady() const { return isReady_; }
+
+    /// Returns whether the process has ended because there is no bus.
+    bool isAbsent() const { return isAbsent_; }
 
     int descriptor() const { return output_.get(); }
     bool isAlive() const { return static_cast<bool>(output_); }
 
-    /// Takes what has arrived.
+    /// Takes what has arrived. Ends the process if it hangs.
     void serve(const AccessibilityEvents& events);
 
-    /// Another window is on top. The answer tells its focus.
+    /// Another window is on top, which the next questions are about.
     void windowChanged(std::uint32_t process);
 
     /// Asks for the focus of the window on top, unless such a question waits for its answer or is younger than
@@ -53,6 +58,8 @@ public:
 
 private:
     bool readLines(const std::function<void(const std::string&)>& take);
+    void take(const std::string& line, const AccessibilityEvents& events);
+    bool hangs() const;
     void send(const std::string& line);
     void end();
 
@@ -64,7 +71,10 @@ private:
     std::optional<Instant> asked_; ///< when the question was asked that waits
     Instant lastAsked_ = 0;
     std::uint64_t askedWindow_ = 0;
-    bool isHovering_ = false;
+    std::optional<Instant> askedHover_;
+    std::uint64_t hoverWindow_ = 0;
+    bool isReady_ = false;
+    bool isAbsent_ = false;
 };
 
 /// The child's side: asks the bus of the display that the environment names, until its input ends.

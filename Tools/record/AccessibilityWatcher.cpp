@@ -6,10 +6,12 @@
 #include <atspi/atspi.h>
 #include <glib-unix.h>
 
+#include <array>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <iostream>
+#include <memory>
 #include <sstream>
 
 namespace Recorder {
@@ -46,7 +48,7 @@ private:
 
     std::string pending_;
     std::uint32_t process_ = 0;     ///< of the window on top
-    Object<AtspiAccessible> focus_; ///< the last that was told, or was found
+    Object<AtspiAccessible> focus_; ///< the last one that an event or a search has found
     std::uint32_t focusProcess_ = 0;
 };
 
@@ -69,6 +71,17 @@ const char* kindOf(AtspiAccessible* accessible) {
         return nullptr;
     }
     return role == ATSPI_ROLE_PASSWORD_TEXT ? "password" : "ordinary";
+}
+
+/// Whether an object is in the window that the keys of its application go to.
+bool isInActiveWindow(AtspiAccessible* accessible) {
+    Object<AtspiAccessible> object(static_cast<AtspiAccessible*>(g_object_ref(accessible)));
+    for (int depth = 0; object && depth < s_deepest; ++depth) {
+        if (hasState(object.get(), ATSPI_STATE_ACTIVE))
+            return true;
+        object.reset(atspi_accessible_get_parent(object.get(), nullptr));
+    }
+    return false;
 }
 
 void focusChanged(AtspiEvent* event, void* watcher) {
@@ -115,11 +128,16 @@ gboolean Watcher::inputArrived(gint descriptor, GIOCondition, gpointer self) {
     if (count <= 0)
         std::_Exit(0); // the recorder has ended
     watcher.pending_.append(bytes.data(), static_cast<std::size_t>(count));
+    std::string hover; // which may take long, so that what keys wait for is answered first
     for (std::size_t end = 0; (end = watcher.pending_.find('\n')) != std::string::npos;) {
         const std::string line = watcher.pending_.substr(0, end);
         watcher.pending_.erase(0, end + 1);
-        watcher.obey(line);
+        if (line.starts_with("hover"))
+            hover = line;
+        else
+            watcher.obey(line);
     }
+    watcher.obey(hover);
     return G_SOURCE_CONTINUE;
 }
 
@@ -145,8 +163,9 @@ void Watcher::obey(const std::string& line) {
 
 void Watcher::focused(AtspiAccessible* accessible) {
     const std::uint32_t process = processOf(accessible);
-    const char* kind = kindOf(accessible);
-    focus_.reset(static_cast<AtspiAccessible*>(g_object_ref(accessible)));
+    const bool isOnTop = isInActiveWindow(accessible);
+    const char* kind = isOnTop ? kindOf(accessible) : nullptr;
+    focus_.reset(isOnTop ? static_cast<AtspiAccessible*>(g_object_ref(accessible)) : nullptr);
     focusProcess_ = process;
     say("focus " + std::to_string(process) + " " + (kind ? kind : "unknown"));
 }
@@ -172,11 +191,10 @@ Object<AtspiAccessible> Watcher::activeWindowOf(AtspiAccessible* application) {
     return nullptr;
 }
 
+/// Some documents have the state as well as the field in them, so the innermost object counts.
 Object<AtspiAccessible> Watcher::focusIn(AtspiAccessible* accessible, int& visits) {
     if (++visits > s_visitedAtMost)
         return nullptr;
-    if (hasState(accessible, ATSPI_STATE_FOCUSED))
-        return Object<AtspiAccessible>(static_cast<AtspiAccessible*>(g_object_ref(accessible)));
     const int count = atspi_accessible_get_child_count(accessible, nullptr);
     for (int i = 0; i < count && visits <= s_visitedAtMost; ++i) {
         const Object<AtspiAccessible> child(atspi_accessible_get_child_at_index(accessible, i, nullptr));
@@ -185,13 +203,16 @@ Object<AtspiAccessible> Watcher::focusIn(AtspiAccessible* accessible, int& visit
         if (Object<AtspiAccessible> found = focusIn(child.get(), visits))
             return found;
     }
-    return nullptr;
+    const bool hasFocus = visits <= s_visitedAtMost && hasState(accessible, ATSPI_STATE_FOCUSED);
+    return Object<AtspiAccessible>(hasFocus ? static_cast<AtspiAccessible*>(g_object_ref(accessible)) : nullptr);
 }
 
-/// Asks the application itself each time, so that its answer follows all that it has told before.
+/// Asks the application itself each time, so that its answer follows all events that it has sent before.
 const char* Watcher::currentFocus() {
     if (process_ == 0)
         return nullptr;
+    if (focus_)
+        atspi_accessible_clear_cache(focus_.get());
     if (!focus_ || focusProcess_ != process_ || !hasState(focus_.get(), ATSPI_STATE_FOCUSED)) {
         focus_.reset();
         const Object<AtspiAccessible> application = applicationOf(process_);

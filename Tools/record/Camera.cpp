@@ -192,7 +192,7 @@ std::optional<std::int64_t> Camera::movieTime(Instant instant) {
     std::int64_t time = 0;
     {
         const std::lock_guard lock(mutex_);
-        if ((stopAt_ && instant >= *stopAt_) || (pausedAt_ && instant >= *pausedAt_))
+        if (instant < resumedAt_ || (stopAt_ && instant >= *stopAt_) || (pausedAt_ && instant >= *pausedAt_))
             return std::nullopt;
         isFirst = !zero_;
         if (isFirst) {

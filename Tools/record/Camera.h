@@ -21,7 +21,7 @@ struct SwsContext;
 
 namespace Recorder {
 
-/// What the camera tells, on its own threads.
+/// What the camera reports, on its own threads.
 struct CameraEvents {
     std::function<void(Instant)> started;               ///< the instant of the first frame
     std::function<void(Instant, Position)> sawPointer;  ///< at each tick

@@ -21,8 +21,7 @@ std::string titleOf(const XConnection& connection, xcb_window_t window) {
 }
 
 std::vector<xcb_window_t> childrenOf(const XConnection& connection, xcb_window_t window) {
-    const auto cookie = xcb_query_tree(connection.get(), window);
-    const Reply<xcb_query_tree_reply_t> tree(xcb_query_tree_reply(connection.get(), cookie, nullptr));
+    const auto tree = connection.treeOf(window);
     if (!tree)
         return {};
     const xcb_window_t* children = xcb_query_tree_children(tree.get());
@@ -81,7 +80,7 @@ xcb_window_t clickedWindow(XConnection& connection) {
         throw Refusal("--window click: another program holds the pointer; name the window instead");
     xcb_window_t window = XCB_NONE;
     while (const Reply<xcb_generic_event_t> event{xcb_wait_for_event(connection.get())})
-        if ((event->response_type & 0x7f) == XCB_BUTTON_RELEASE) {
+        if ((event->response_type & s_eventTypeBits) == XCB_BUTTON_RELEASE) {
             window = reinterpret_cast<const xcb_button_release_event_t*>(event.get())->child;
             break;
         }
@@ -98,7 +97,7 @@ Area evenSides(Area area) {
 
 void requireInside(const Area& area, const Area& root, const std::string& what) {
     const bool isInside =
-        area.x >= 0 && area.y >= 0 && area.x + area.width <= root.width && area.y + area.height <= root.height;
+        area.x >= 0 && area.y >= 0 && area.width <= root.width - area.x && area.height <= root.height - area.y;
     if (!isInside || area.width < 2 || area.height < 2)
         throw Refusal(
             fmt::format("{}: not inside of the screen, which has {}x{} pixels", what, root.width, root.height));

@@ -103,6 +103,8 @@ ControlSocket::ControlSocket(const fs::path& path) : path_(path) {
         requireOwnFolder(folder);
         path_ = folder / fmt::format("{}{}{}", s_prefix, getpid(), s_suffix);
         unlink(path_.c_str()); // of an earlier process of this number
+    } else if (std::error_code error; fs::is_socket(path_, error) && !connectionTo(path_)) {
+        unlink(path_.c_str()); // of a recorder that was killed
     }
     listener_ = FileHandle(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
     const sockaddr_un address = addressOf(path_);
@@ -187,6 +189,14 @@ int sendCommand(Command command, const fs::path& path) {
         answers.append(bytes.data(), static_cast<std::size_t>(count));
     if (answers.ends_with("kept\n"))
         return ExitLoss;
+    if (command == Command::Stop && !answers.empty() && !answers.ends_with("saved\n"))
+        throw Failure(
+            fmt::format("{}: the recorder ended before its movie was whole; 'zulm record --recover' makes one "
+                        "of its folder",
+                        target.string()),
+            ExitLoss);
+    if (answers == s_tooEarly + std::string("\n"))
+        throw Failure(fmt::format("{}: the recorder has no frame yet; say it again when it has", target.string()));
     if (answers.empty())
         throw Failure(fmt::format("{}: the recorder ended without an answer", target.string()));
     return ExitFine;

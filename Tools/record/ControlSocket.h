@@ -13,6 +13,9 @@ namespace Recorder {
 
 enum class Command { Pause, Resume, Stop };
 
+/// The answer to a command that comes before the first frame.
+inline constexpr const char* s_tooEarly = "too early";
+
 /// The recorder's end. One thread uses it.
 class ControlSocket {
 public:

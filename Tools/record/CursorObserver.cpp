@@ -51,7 +51,7 @@ void CursorObserver::changed(const xcb_xfixes_cursor_notify_event_t& event) {
     ask(clock_.instantOf(event.timestamp));
 }
 
-/// The server hands out the cursor of now. If it has changed again since the event, the next event tells when.
+/// The server returns the present cursor. If it has changed again since the event, the next event has the time.
 void CursorObserver::ask(Instant instant) {
     const auto cookie = xcb_xfixes_get_cursor_image(connection_.get());
     const Reply<xcb_xfixes_get_cursor_image_reply_t> reply(

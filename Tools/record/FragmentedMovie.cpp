@@ -25,8 +25,29 @@ constexpr std::uint32_t s_moof = boxType("moof");
 constexpr std::uint32_t s_free = boxType("free");
 constexpr std::uint64_t s_largestIndex = std::uint64_t{64} << 20;
 constexpr std::uint64_t s_longestMovie = 1'000'000'000; ///< seconds, so that no product of times overflows
-constexpr std::uint32_t s_longestRun = 1 << 16;         ///< samples whose sizes are not told one by one
+constexpr std::uint32_t s_longestRun = 1 << 16;         ///< samples whose sizes are not listed one by one
 constexpr std::uint32_t s_primingOfAAC = 1024;          ///< samples that the encoder puts before the sound
+
+// What the head of a track's fragment (tfhd) says.
+constexpr std::uint32_t s_headHasBase = 0x1;
+constexpr std::uint32_t s_headHasDescription = 0x2;
+constexpr std::uint32_t s_headHasDuration = 0x8;
+constexpr std::uint32_t s_headHasSize = 0x10;
+constexpr std::uint32_t s_headHasFlags = 0x20;
+
+// What a run of samples (trun) says.
+constexpr std::uint32_t s_hasOffset = 0x1;
+constexpr std::uint32_t s_hasFirstFlags = 0x4;
+constexpr std::uint32_t s_hasDurations = 0x100;
+constexpr std::uint32_t s_hasSizes = 0x200;
+constexpr std::uint32_t s_hasFlags = 0x400;
+constexpr std::uint32_t s_hasShowingTimes = 0x800;
+constexpr std::uint32_t s_isNotSync = 0x10000; ///< a flag of a sample
+
+template <class Items>
+std::uint32_t countOf(const Items& items) {
+    return static_cast<std::uint32_t>(items.size());
+}
 
 bool readAt(int file, std::uint64_t offset, std::span<std::uint8_t> bytes) {
     std::size_t done = 0;
@@ -76,7 +97,7 @@ std::optional<FileBox> boxAt(int file, std::uint64_t offset, std::uint64_t end) 
     return box;
 }
 
-/// Indexes are told by the first atom in them, also after they became free space.
+/// The first atom in an index shows that it is one, also after it became free space.
 std::uint32_t typeOf(const FileBox& box, const Bytes& bytes) {
     if (box.type != s_moov && box.type != s_moof && box.type != s_free)
         return box.type;
@@ -205,13 +226,13 @@ bool FragmentedMovie::readTrackFragment(const Box& box, std::uint64_t fragmentOf
     Track* track = trackOf(header.u32());
     if (!track || !header.isWhole())
         return false;
-    const std::uint64_t base = (flags & 0x1) != 0 ? header.u64() : fragmentOffset;
-    if ((flags & 0x2) != 0)
+    const std::uint64_t base = (flags & s_headHasBase) != 0 ? header.u64() : fragmentOffset;
+    if ((flags & s_headHasDescription) != 0)
         header.skip(4);
     Sample usual;
-    usual.duration = (flags & 0x8) != 0 ? header.u32() : track->defaultDuration;
-    usual.size = (flags & 0x10) != 0 ? header.u32() : track->defaultSize;
-    const std::uint32_t usualFlags = (flags & 0x20) != 0 ? header.u32() : track->defaultFlags;
+    usual.duration = (flags & s_headHasDuration) != 0 ? header.u32() : track->defaultDuration;
+    usual.size = (flags & s_headHasSize) != 0 ? header.u32() : track->defaultSize;
+    const std::uint32_t usualFlags = (flags & s_headHasFlags) != 0 ? header.u32() : track->defaultFlags;
     BoxReader start(childOf(box, boxType("tfdt")).payload);
     const bool isWide = start.u32() >> 24 == 1;
     usual.time = isWide ? start.u64() : start.u32();
@@ -234,24 +255,24 @@ bool FragmentedMovie::readRun(const Box& box, std::uint64_t base, std::uint32_t 
     BoxReader reader(box.payload);
     const std::uint32_t has = reader.u32();
     const std::uint32_t count = reader.u32();
-    const std::int64_t distance = (has & 0x1) != 0 ? reader.i32() : 0;
+    const std::int64_t distance = (has & s_hasOffset) != 0 ? reader.i32() : 0;
     if (base > media.end || static_cast<std::int64_t>(base) + distance < 0)
         return false;
     run.chunk.offset = static_cast<std::uint64_t>(static_cast<std::int64_t>(base) + distance);
-    const std::uint32_t firstFlags = (has & 0x4) != 0 ? reader.u32() : usualFlags;
-    const bool tellsSizes = (has & 0x200) != 0;
-    if (run.chunk.offset < media.begin || run.chunk.offset > media.end || (!tellsSizes && count > s_longestRun))
+    const std::uint32_t firstFlags = (has & s_hasFirstFlags) != 0 ? reader.u32() : usualFlags;
+    const bool hasSizes = (has & s_hasSizes) != 0;
+    if (run.chunk.offset < media.begin || run.chunk.offset > media.end || (!hasSizes && count > s_longestRun))
         return false;
     for (std::uint32_t i = 0; i < count; ++i) {
         Sample sample = usual;
-        if ((has & 0x100) != 0)
+        if ((has & s_hasDurations) != 0)
             sample.duration = reader.u32();
-        if (tellsSizes)
+        if (hasSizes)
             sample.size = reader.u32();
-        const std::uint32_t own = (has & 0x400) != 0 ? reader.u32() : i == 0 ? firstFlags : usualFlags;
-        if ((has & 0x800) != 0)
+        const std::uint32_t own = (has & s_hasFlags) != 0 ? reader.u32() : i == 0 ? firstFlags : usualFlags;
+        if ((has & s_hasShowingTimes) != 0)
             reader.skip(4); // pictures are shown in the order in which they are decoded
-        sample.isSync = (own & 0x10000) == 0;
+        sample.isSync = (own & s_isNotSync) == 0;
         run.bytes += sample.size;
         if (!reader.isWhole() || sample.size == 0 || run.bytes > media.end - run.chunk.offset)
             return false;
@@ -297,7 +318,7 @@ void FragmentedMovie::makeOrdinary(int file) const {
     if (ftruncate(file, static_cast<off_t>(wholeBytes_)) != 0)
         throw failed("cannot be cut to its whole fragments");
     // The new index comes to the disk as free space first. Until its type is set, the fragments still have theirs, or
-    // can be told by what is in them.
+    // can be recognised by what is in them.
     constexpr std::size_t typeAt = 4;
     const auto setType = [&](std::uint64_t box, std::uint32_t type) {
         BoxWriter writer;
@@ -387,67 +408,84 @@ void FragmentedMovie::writeMedia(BoxWriter& writer, const Box& box, const Track&
     });
 }
 
-void FragmentedMovie::writeTables(BoxWriter& writer, const Box& box, const Track& track) const {
-    /// Numbers that stand for a row of equal ones.
-    struct Run {
-        std::uint32_t first;
-        std::uint32_t value;
+void FragmentedMovie::writeTables(BoxWriter& writer, const Box& box, const Track& track) {
+    writer.box(boxType("stbl"), [&] {
+        writer.bytes(childOf(box, boxType("stsd")).whole);
+        writeDurations(writer, track);
+        writeSyncSamples(writer, track);
+        writeChunkSizes(writer, track);
+        writer.fullBox(boxType("stsz"), 0, 0, [&] {
+            writer.u32(0);
+            writer.u32(countOf(track.samples));
+            for (const Sample& sample : track.samples)
+                writer.u32(sample.size);
+        });
+        writer.fullBox(boxType("co64"), 0, 0, [&] {
+            writer.u32(countOf(track.chunks));
+            for (const Chunk& chunk : track.chunks)
+                writer.u64(chunk.offset);
+        });
+    });
+}
+
+/// A sample lasts until the next one.
+void FragmentedMovie::writeDurations(BoxWriter& writer, const Track& track) {
+    struct Row {
+        std::uint32_t samples;
+        std::uint32_t duration;
     };
     const auto& samples = track.samples;
-    std::vector<Run> durations; // count, duration
+    std::vector<Row> rows;
     for (std::size_t i = 0; i < samples.size(); ++i) {
         const bool hasNext = i + 1 < samples.size() && samples[i + 1].time >= samples[i].time;
         const std::uint64_t length =
             hasNext ? samples[i + 1].time - samples[i].time : std::uint64_t{samples[i].duration};
         const auto duration = static_cast<std::uint32_t>(std::min<std::uint64_t>(length, 0xffffffff));
-        if (durations.empty() || durations.back().value != duration)
-            durations.push_back({0, duration});
-        ++durations.back().first;
+        if (rows.empty() || rows.back().duration != duration)
+            rows.push_back({0, duration});
+        ++rows.back().samples;
     }
-    std::vector<Run> chunkSizes; // number of the first chunk, samples in it
-    for (std::size_t i = 0; i < track.chunks.size(); ++i)
-        if (chunkSizes.empty() || chunkSizes.back().value != track.chunks[i].samples)
-            chunkSizes.push_back({static_cast<std::uint32_t>(i + 1), track.chunks[i].samples});
-    std::vector<std::uint32_t> syncs;
-    for (std::size_t i = 0; i < samples.size(); ++i)
-        if (samples[i].isSync)
-            syncs.push_back(static_cast<std::uint32_t>(i + 1));
+    writer.fullBox(boxType("stts"), 0, 0, [&] {
+        writer.u32(countOf(rows));
+        for (const Row& row : rows) {
+            writer.u32(row.samples);
+            writer.u32(row.duration);
+        }
+    });
+}
 
-    const auto count = [&writer](std::size_t number) { writer.u32(static_cast<std::uint32_t>(number)); };
-    writer.box(boxType("stbl"), [&] {
-        writer.bytes(childOf(box, boxType("stsd")).whole);
-        writer.fullBox(boxType("stts"), 0, 0, [&] {
-            count(durations.size());
-            for (const Run& run : durations) {
-                writer.u32(run.first);
-                writer.u32(run.value);
-            }
-        });
-        if (syncs.size() < samples.size())
-            writer.fullBox(boxType("stss"), 0, 0, [&] {
-                count(syncs.size());
-                for (const std::uint32_t sync : syncs)
-                    writer.u32(sync);
-            });
-        writer.fullBox(boxType("stsc"), 0, 0, [&] {
-            count(chunkSizes.size());
-            for (const Run& run : chunkSizes) {
-                writer.u32(run.first);
-                writer.u32(run.value);
-                writer.u32(1);
-            }
-        });
-        writer.fullBox(boxType("stsz"), 0, 0, [&] {
-            writer.u32(0);
-            count(samples.size());
-            for (const Sample& sample : samples)
-                writer.u32(sample.size);
-        });
-        writer.fullBox(boxType("co64"), 0, 0, [&] {
-            count(track.chunks.size());
-            for (const Chunk& chunk : track.chunks)
-                writer.u64(chunk.offset);
-        });
+/// Without this table every sample can be decoded by itself.
+void FragmentedMovie::writeSyncSamples(BoxWriter& writer, const Track& track) {
+    std::vector<std::uint32_t> numbers;
+    for (std::size_t i = 0; i < track.samples.size(); ++i)
+        if (track.samples[i].isSync)
+            numbers.push_back(static_cast<std::uint32_t>(i + 1));
+    if (numbers.size() == track.samples.size())
+        return;
+    writer.fullBox(boxType("stss"), 0, 0, [&] {
+        writer.u32(countOf(numbers));
+        for (const std::uint32_t number : numbers)
+            writer.u32(number);
+    });
+}
+
+void FragmentedMovie::writeChunkSizes(BoxWriter& writer, const Track& track) {
+    struct Row {
+        std::uint32_t firstChunk;
+        std::uint32_t samples; ///< in this chunk and those up to the next row
+    };
+    std::vector<Row> rows;
+    for (std::size_t i = 0; i < track.chunks.size(); ++i)
+        if (rows.empty() || rows.back().samples != track.chunks[i].samples)
+            rows.push_back({static_cast<std::uint32_t>(i + 1), track.chunks[i].samples});
+    constexpr std::uint32_t onlyDescription = 1;
+    writer.fullBox(boxType("stsc"), 0, 0, [&] {
+        writer.u32(countOf(rows));
+        for (const Row& row : rows) {
+            writer.u32(row.firstChunk);
+            writer.u32(row.samples);
+            writer.u32(onlyDescription);
+        }
     });
 }
 

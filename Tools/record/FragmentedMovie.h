@@ -21,7 +21,6 @@ public:
     FragmentedMovie(int file, const std::string& name);
 
     std::uint64_t wholeBytes() const { return wholeBytes_; } ///< up to the end of the last whole fragment
-    std::uint64_t fileBytes() const { return fileBytes_; }   ///< all of them
     std::uint64_t frames() const;                            ///< samples of the first track
     double duration() const;                                 ///< seconds of the first track
 
@@ -76,7 +75,10 @@ private:
     Bytes ordinaryIndex() const;
     void writeTrack(BoxWriter& writer, const Box& box) const;
     void writeMedia(BoxWriter& writer, const Box& box, const Track& track) const;
-    void writeTables(BoxWriter& writer, const Box& box, const Track& track) const;
+    static void writeTables(BoxWriter& writer, const Box& box, const Track& track);
+    static void writeDurations(BoxWriter& writer, const Track& track);
+    static void writeSyncSamples(BoxWriter& writer, const Track& track);
+    static void writeChunkSizes(BoxWriter& writer, const Track& track);
 
     std::string name_;
     Bytes movie_; ///< the atom of the index as the file has it

@@ -8,8 +8,12 @@ using namespace ZULMetaData;
 
 namespace {
 
-constexpr Instant s_wait = 250 * s_millisecond;
+constexpr Instant s_wait = 250 * s_millisecond; ///< longer than it takes from a click or key to what it leads to
 constexpr std::uint32_t s_controlFlag = 0x40000;
+
+bool isJustBefore(Instant instant, Instant earlier) {
+    return earlier <= instant && earlier > instant - s_wait;
+}
 
 } // namespace
 
@@ -44,7 +48,7 @@ void HeldInput::release() {
 
 void HeldInput::dropTrigger(Instant instant) {
     const auto isTrigger = [instant](const Entry& entry) {
-        return entry.isPress() && entry.instant <= instant && entry.instant > instant - s_wait;
+        return entry.isPress() && isJustBefore(instant, entry.instant);
     };
     const auto key = std::find_if(keys_.rbegin(), keys_.rend(), isTrigger);
     const auto button = std::find_if(buttons_.rbegin(), buttons_.rend(), isTrigger);
@@ -55,9 +59,10 @@ void HeldInput::dropTrigger(Instant instant) {
         keys_.erase(std::prev(key.base()));
 }
 
-void HeldInput::dropInterruptKey() {
-    const auto isInterrupt = [](const Entry& entry) {
-        return (std::get<KeyStroke>(entry.what).eventFlagsCode & s_controlFlag) != 0;
+void HeldInput::dropInterruptKey(Instant instant) {
+    const auto isInterrupt = [instant](const Entry& entry) {
+        return isJustBefore(instant, entry.instant) &&
+               (std::get<KeyStroke>(entry.what).eventFlagsCode & s_controlFlag) != 0;
     };
     const auto key = std::find_if(keys_.rbegin(), keys_.rend(), isInterrupt);
     if (key != keys_.rend())

@@ -28,8 +28,8 @@ public:
     /// Leaves out the click or key that ended the recording at `instant`, which is the last one pressed before.
     void dropTrigger(Instant instant);
 
-    /// The same for an interrupt of the terminal: the last key with Ctrl.
-    void dropInterruptKey();
+    /// Leaves out the key by which the terminal interrupted the recording at `instant`: the last one with Ctrl.
+    void dropInterruptKey(Instant instant);
 
     /// Writes everything that may be written without waiting longer, because the recording ends at `instant`.
     void releaseAll(Instant end);

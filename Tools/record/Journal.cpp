@@ -10,11 +10,12 @@ namespace {
 
 /// Clicks and keys wait for 0.25 s before they come here, and all must be on the disk within 0.5 s.
 constexpr std::chrono::milliseconds s_flushInterval(150);
+constexpr double s_justBefore = 0.001; ///< seconds
 
 } // namespace
 
-Journal::Journal(const std::filesystem::path& folder, const std::function<void()>& onLoss)
-    : session_(folder, SessionOptions{s_flushInterval, [onLoss](const Error&) { onLoss(); }, {}}) {}
+Journal::Journal(const std::filesystem::path& folder, const std::function<void(const Error&)>& onLoss)
+    : session_(folder, SessionOptions{s_flushInterval, onLoss, {}}) {}
 
 template <class Kind>
 void Journal::begin(Slot<Kind>& own, Instant zero) {
@@ -50,8 +51,12 @@ void Journal::resume(Instant instant) {
     const auto writeChanged = [this, instant](auto& slot) {
         using Kind = typename std::remove_reference_t<decltype(slot)>::KindType;
         if constexpr (Kind::role == StreamRole::State)
-            if (slot.held && (!slot.written || !isSameState(*slot.held, *slot.written)))
-                write<Kind>(slot, timeOf(instant), *slot.held);
+            if (slot.held && (!slot.written || !isSameState(*slot.held, *slot.written))) {
+                const double time = timeOf(instant);
+                if (std::is_same_v<Kind, CursorLocationKind> && slot.written && slot.time < time - s_justBefore)
+                    write<Kind>(slot, time - s_justBefore, Noted<Kind>(*slot.written)); // it rested until the pause
+                write<Kind>(slot, time, *slot.held);
+            }
     };
     std::apply([&](auto&... slots) { (writeChanged(slots), ...); }, slots_);
 }

@@ -29,7 +29,8 @@ using Noted = std::conditional_t<std::is_same_v<Kind, ZULMetaData::CursorImageKi
 /// Writes observations, which have instants, as entries, which have times. One thread uses it.
 class Journal {
 public:
-    Journal(const std::filesystem::path& folder, const std::function<void()>& onLoss);
+    /// `onLoss` is called once, if an entry cannot be written.
+    Journal(const std::filesystem::path& folder, const std::function<void(const ZULMetaData::Error&)>& onLoss);
 
     /// Notes an observation. A state that holds already is not written again.
     template <class Kind>
@@ -48,6 +49,9 @@ public:
     /// Goes on, and writes the states that changed meanwhile.
     void resume(Instant instant);
 
+    /// Nothing from `instant` on is recorded, which may lie ahead. Without one, the recording has no end yet.
+    void endAt(std::optional<Instant> instant) { end_ = instant; }
+
     /// Returns the time in the recording, less pauses. An instant in a pause has that of the pause.
     double timeOf(Instant instant) const {
         return clock_.timeOf(timeIn(instant), ZULMetaData::RecordingClock::Outside::MoveToEdge).value_or(0);
@@ -64,10 +68,10 @@ private:
     template <class Kind>
     struct Slot {
         using KindType = Kind;
-        std::optional<Noted<Kind>> held;    ///< the last one that was noted
-        std::optional<Noted<Kind>> written; ///< the last one in the stream
-        double time = 0;                    ///< of the last entry
-        std::vector<std::pair<Instant, Noted<Kind>>> early;
+        std::optional<Noted<Kind>> held;                   ///< the last one that was noted
+        std::optional<Noted<Kind>> written;                ///< the last one in the stream
+        double time = 0;                                   ///< of the last entry
+        std::deque<std::pair<Instant, Noted<Kind>>> early; ///< before it is known when the recording began
     };
     template <class... Kinds>
     static std::tuple<Slot<Kinds>...> slotsOf(ZULMetaData::KindList<Kinds...>);
@@ -80,12 +84,15 @@ private:
     void write(Slot<Kind>& slot, double time, const Noted<Kind>& value);
     template <class Kind>
     void begin(Slot<Kind>& slot, Instant zero);
-    /// Returns nothing for an instant before the first frame or in a pause.
-    std::optional<double> timeInside(Instant instant) const { return clock_.timeOf(timeIn(instant)); }
+    /// Returns nothing for what is not in the recording. A state that was observed a little before it began or goes on
+    /// still holds then.
+    template <class Kind>
+    std::optional<double> timeInside(Instant instant) const;
 
     ZULMetaData::SessionWriter session_;
     decltype(slotsOf(ZULMetaData::RecordedKinds())) slots_;
     ZULMetaData::RecordingClock clock_;
+    std::optional<Instant> end_;
     std::uint64_t bytes_ = 0;
 };
 
@@ -105,17 +112,27 @@ bool isSameState(const Value& left, const Value& right) {
 }
 
 template <class Kind>
+std::optional<double> Journal::timeInside(Instant instant) const {
+    if (end_ && instant >= *end_)
+        return std::nullopt;
+    return clock_.isPaused() ? clock_.timeOf(timeIn(instant)) : clock_.timeOf<Kind>(timeIn(instant));
+}
+
+template <class Kind>
 void Journal::note(Instant instant, const Noted<Kind>& value) {
     constexpr bool isState = Kind::role == ZULMetaData::StreamRole::State;
     constexpr bool isRepeated = !isState || isMeasured<Kind>;
     Slot<Kind>& own = slot<Kind>();
     if (!clock_.hasStarted()) {
+        constexpr Instant longestStart = 10 * s_second; // of the first frame, after its instant
         own.early.emplace_back(instant, value);
+        while (own.early.size() > 1 && own.early[1].first < instant - longestStart)
+            own.early.pop_front();
         return;
     }
     if constexpr (isState)
         own.held = value;
-    const std::optional<double> time = timeInside(instant);
+    const std::optional<double> time = timeInside<Kind>(instant);
     if (time && (isRepeated || !own.written || !isSameState(*own.written, value)))
         write<Kind>(own, *time, value);
 }
@@ -123,7 +140,7 @@ void Journal::note(Instant instant, const Noted<Kind>& value) {
 template <class Kind>
 void Journal::noteStill(Instant instant) {
     Slot<Kind>& own = slot<Kind>();
-    const std::optional<double> time = timeInside(instant);
+    const std::optional<double> time = timeInside<Kind>(instant);
     if (own.written && time && *time > own.time)
         write<Kind>(own, *time, Noted<Kind>(*own.written));
 }

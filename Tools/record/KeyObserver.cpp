@@ -169,13 +169,23 @@ Modifiers KeyObserver::unconsumed(xkb_keycode_t key, Modifiers held, xkb_keysym_
     return rest;
 }
 
-void KeyObserver::pressed(std::uint8_t key, std::uint32_t serverTime) {
+void KeyObserver::pressed(std::uint8_t key, std::uint32_t serverTime, bool isHidden) {
+    hidden_[key] = isHidden;
+    repeated(key, serverTime);
+}
+
+void KeyObserver::repeated(std::uint8_t key, std::uint32_t serverTime) {
     refresh();
-    if (!state_ || privacy_.mode() == KeyMode::Nothing)
+    if (hidden_[key] || !state_ || privacy_.mode() == KeyMode::Nothing)
         return;
     const std::optional<Meaning> meaning = meaningOf(key);
     if (meaning && privacy_.takesKey(!meaning->isShortcut) && !privacy_.isDenied())
         input_.addKey(clock_.instantOf(serverTime), meaning->stroke);
+}
+
+void KeyObserver::windowChanged() {
+    if (compose_)
+        xkb_compose_state_reset(compose_.get());
 }
 
 std::optional<KeyObserver::Meaning> KeyObserver::meaningOf(xkb_keycode_t key) {
@@ -203,11 +213,16 @@ std::optional<KeyObserver::Meaning> KeyObserver::meaningOf(xkb_keycode_t key) {
     }
     if (character)
         return Meaning{storedCharacter(character, rest)};
-    return Meaning{storedKey(virtualKeyOf(symbol), held), true};
+    return keyOf(virtualKeyOf(symbol), held);
+}
+
+/// A key without a code is left out: nobody could say which one it was.
+std::optional<KeyObserver::Meaning> KeyObserver::keyOf(VirtualKey key, Modifiers held) {
+    return key != VirtualKey::Unknown ? std::optional(Meaning{storedKey(key, held), true}) : std::nullopt;
 }
 
 /// A key with Ctrl, Alt or Super is known by what it types without them.
-KeyObserver::Meaning KeyObserver::chord(xkb_keycode_t key, xkb_keysym_t symbol, Modifiers held) const {
+std::optional<KeyObserver::Meaning> KeyObserver::chord(xkb_keycode_t key, xkb_keysym_t symbol, Modifiers held) const {
     const xkb_layout_index_t group = xkb_state_key_get_layout(state_.get(), key);
     const xkb_keysym_t* symbols = nullptr;
     const int count = xkb_keymap_key_get_syms_by_level(keymap_.get(), key, group, 0, &symbols);
@@ -215,11 +230,11 @@ KeyObserver::Meaning KeyObserver::chord(xkb_keycode_t key, xkb_keysym_t symbol, 
     const bool isKeypadDigit = symbol >= XKB_KEY_KP_0 && symbol <= XKB_KEY_KP_9;
     const char32_t character = characterOf(isKeypadDigit ? symbol : base);
     if (const std::uint32_t code = virtualKeyOfCharacter(character))
-        return {storedKey(static_cast<VirtualKey>(code), held), true};
+        return keyOf(static_cast<VirtualKey>(code), held);
     if (character)
-        return {storedCharacter(character, held), true};
+        return Meaning{storedCharacter(character, held), true};
     const VirtualKey named = virtualKeyOf(symbol);
-    return {storedKey(named != VirtualKey::Unknown ? named : virtualKeyOf(base), held), true};
+    return keyOf(named != VirtualKey::Unknown ? named : virtualKeyOf(base), held);
 }
 
 } // namespace Recorder

@@ -1,6 +1,7 @@
 #pragma once
 
 #include "Tools/record/HeldInput.h"
+#include "Tools/record/Releaser.h"
 #include "Tools/record/ServerClock.h"
 #include "Tools/record/XConnection.h"
 
@@ -8,19 +9,23 @@
 #include <xkbcommon/xkbcommon-compose.h>
 #include <xkbcommon/xkbcommon.h>
 
+#include <bitset>
 #include <cstdint>
 #include <memory>
 #include <optional>
 
 namespace Recorder {
 
-/// Which keys are pressed, as what they type.
+/// Records which keys are pressed, as what they type.
 class KeyObserver {
 public:
     KeyObserver(XConnection& connection, const ServerClock& clock, HeldInput& input, PrivacyFilter& privacy);
 
-    /// Takes a press, or its repetition.
-    void pressed(std::uint8_t key, std::uint32_t serverTime);
+    /// Takes a press. One that is hidden is not recorded, nor are its repetitions.
+    void pressed(std::uint8_t key, std::uint32_t serverTime, bool isHidden);
+
+    /// Takes a repetition of a press.
+    void repeated(std::uint8_t key, std::uint32_t serverTime);
 
     /// Takes an event of the keyboard extension.
     void keyboardChanged(const xcb_generic_event_t& event);
@@ -30,18 +35,13 @@ public:
     /// for a few milliseconds.
     void refresh();
 
+    /// Another window has the keys now, so no dead key waits for the next one.
+    void windowChanged();
+
     /// Returns the modifiers that are down now.
     ZULMetaData::Modifiers modifiers() const;
 
 private:
-    template <auto release>
-    struct Releaser {
-        template <class T>
-        void operator()(T* object) const {
-            release(object);
-        }
-    };
-
     /// What a key press means.
     struct Meaning {
         ZULMetaData::KeyStroke stroke;
@@ -51,7 +51,8 @@ private:
     void readKeyboard();
     void openCompose();
     std::optional<Meaning> meaningOf(xkb_keycode_t key);
-    Meaning chord(xkb_keycode_t key, xkb_keysym_t symbol, ZULMetaData::Modifiers held) const;
+    std::optional<Meaning> chord(xkb_keycode_t key, xkb_keysym_t symbol, ZULMetaData::Modifiers held) const;
+    static std::optional<Meaning> keyOf(ZULMetaData::VirtualKey key, ZULMetaData::Modifiers held);
     bool isConsumed(xkb_keycode_t key, xkb_mod_index_t modifier) const;
     ZULMetaData::Modifiers unconsumed(xkb_keycode_t key, ZULMetaData::Modifiers held, xkb_keysym_t symbol) const;
     xkb_mod_index_t indexOf(ZULMetaData::Modifier modifier) const;
@@ -62,7 +63,8 @@ private:
     PrivacyFilter& privacy_;
     std::uint8_t firstEvent_ = 0;
     std::int32_t device_ = -1;
-    bool isStale_ = false; ///< the map has changed since it was read
+    std::bitset<256> hidden_; ///< keys whose last press is hidden
+    bool isStale_ = false;    ///< the map has changed since it was read
     std::unique_ptr<xkb_context, Releaser<xkb_context_unref>> context_;
     std::unique_ptr<xkb_keymap, Releaser<xkb_keymap_unref>> keymap_;
     std::unique_ptr<xkb_state, Releaser<xkb_state_unref>> state_;

@@ -52,8 +52,10 @@ void MachineObserver::poll() {
     next_ = std::max(next_ + s_second, instant);
     const Ticks ticks = readTicks();
     if (ticks.all > last_.all) {
-        const auto busy = static_cast<float>(ticks.busy - last_.busy);
-        journal_.note<CPUUsageKind>(instant, 100 * busy / static_cast<float>(ticks.all - last_.all));
+        // A processor that is taken out takes its ticks with it.
+        const std::uint64_t busy = std::min(std::max(ticks.busy, last_.busy) - last_.busy, ticks.all - last_.all);
+        journal_.note<CPUUsageKind>(instant,
+                                    100 * static_cast<float>(busy) / static_cast<float>(ticks.all - last_.all));
     }
     last_ = ticks;
 }
@@ -65,6 +67,8 @@ std::int32_t scaleOf(const XConnection& connection) {
         const std::size_t end = std::min(resources.find('\n', start), resources.size());
         if (resources.compare(start, name.size(), name) == 0) {
             const double dots = std::strtod(resources.c_str() + start + name.size(), nullptr);
+            if (!(dots > 0)) // nor a number at all
+                return 1;
             return std::max(1, static_cast<std::int32_t>(std::lround(std::min(dots, 9600.0) / s_usualDotsPerInch)));
         }
         start = end + 1;

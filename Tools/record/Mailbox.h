@@ -1,6 +1,6 @@
 #pragma once
 
-// What the camera's threads tell the thread that observes.
+// What the camera's threads report to the thread that observes.
 
 #include "Tools/record/FileHandle.h"
 #include "Tools/record/Geometry.h"

@@ -19,7 +19,8 @@ namespace {
 Area areaOf(const std::string& text) {
     Area area;
     int read = 0;
-    const int count = std::sscanf(text.c_str(), "%d,%d,%dx%d%n", &area.x, &area.y, &area.width, &area.height, &read);
+    const int count =
+        std::sscanf(text.c_str(), "%9d,%9d,%9dx%9d%n", &area.x, &area.y, &area.width, &area.height, &read);
     if (count != 4 || static_cast<std::size_t>(read) != text.size() || area.width < 1 || area.height < 1)
         throw Refusal(fmt::format("--region {}: not of the form X,Y,WxH, such as 100,50,1280x720", text));
     return area;
@@ -40,7 +41,7 @@ private:
     static constexpr std::size_t s_descriptionColumn = 28;
     static constexpr std::size_t s_pageWidth = 80;
 
-    /// In lines that begin at this column; the formatter puts them there.
+    /// Returns a text in lines that begin at this column; the formatter puts them there.
     static std::string wrapped(const std::string& text, std::size_t begin) {
         std::string lines;
         std::size_t column = begin;
@@ -86,7 +87,9 @@ void addControl(CLI::App& app, GivenOptions& given) {
     app.add_flag("--stop", given.stop, "End it, and wait until its movie is whole");
     app.add_option("--recover", given.recover, "Make a movie of what a recorder left that was killed")
         ->type_name("FOLDER");
-    app.add_flag("--delete", given.options.deletesFolder, "With --recover, remove the folder if the movie is whole");
+    app.add_flag("--delete", given.options.deletesFolder,
+                 "With --recover, remove the recorder's own files if the movie holds what they hold, and the folder if "
+                 "nothing else is in it");
     app.add_option("--socket", given.socket,
                    "The socket by which the recorder is controlled, if several run; one in the user's runtime folder "
                    "unless it is given")
@@ -106,12 +109,14 @@ void addPlace(CLI::App& app, GivenOptions& given) {
 
 void addMovie(CLI::App& app, GivenOptions& given) {
     VideoSettings& video = given.options.video;
-    app.add_option("--duration", given.duration, "End after so many seconds of recording")->type_name("SECONDS");
+    app.add_option("--duration", given.duration, "End after this many seconds of recording")->type_name("SECONDS");
     app.add_option("--fps", video.fps, "Frames a second, from 1 to 60; 30 unless it is given")
         ->type_name("N")
         ->check(CLI::Range(1, 60).description(""));
     app.add_option("--codec", video.codec, "An encoder of libavcodec; h264 unless it is given")->type_name("NAME");
-    app.add_option("--quality", video.quality, "From 0, the best, to 51; 20 unless it is given")
+    app.add_option("--quality", video.quality,
+                   "From 0, the best, to 51, if the encoder has such a scale, as that of h264; 20 "
+                   "unless it is given")
         ->type_name("N")
         ->check(CLI::Range(0, 51).description(""));
     app.add_option("--audio", given.sound, "Record sound, from this source of PulseAudio or from the default one")
@@ -139,19 +144,20 @@ void addPrivacy(CLI::App& app, Options& options) {
         ->transform(CLI::Validator(numbered, ""));
     app.add_flag("--without-accessibility", options.withoutAccessibility,
                  "Do not ask the accessibility bus: with '--keys all', passwords are recorded too");
-    app.add_option("--deny-app", options.deniedApps,
-                   "No keys, titles and rectangles while a window is on top whose application matches this regular "
-                   "expression, regardless of case")
+    app.add_option(
+           "--deny-app", options.deniedApps,
+           "Record no keys, titles and rectangles while a window is on top whose application matches this regular "
+           "expression, regardless of the case of A to Z")
         ->type_name("PATTERN")
         ->expected(1)
         ->take_all();
-    app.add_option("--deny-title", options.deniedTitles, "The same for windows whose title matches")
+    app.add_option("--deny-title", options.deniedTitles, "Do the same if the title of the window matches")
         ->type_name("PATTERN")
         ->expected(1)
         ->take_all();
 }
 
-/// What was given, as the recorder uses it.
+/// Returns what was given, as the recorder uses it.
 Options completed(GivenOptions& given, bool isWatcher) {
     Options options = std::move(given.options);
     if (isWatcher)

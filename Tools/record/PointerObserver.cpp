@@ -51,8 +51,7 @@ void PointerObserver::followMotions() {
     const Instant instant = *motion_;
     motion_.reset();
     const Instant asked = now();
-    const auto cookie = xcb_query_pointer(connection_.get(), connection_.root());
-    const Reply<xcb_query_pointer_reply_t> reply(xcb_query_pointer_reply(connection_.get(), cookie, nullptr));
+    const auto reply = connection_.pointer();
     if (reply && reply->same_screen)
         note(instant, asked, {reply->root_x, reply->root_y});
 }

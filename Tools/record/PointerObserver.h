@@ -28,7 +28,7 @@ public:
     void devicesChanged() { axes_.clear(); }
     void buttonsRemapped();
 
-    /// Asks where the pointer is if a motion was told since the last call.
+    /// Asks where the pointer is if there was a motion since the last call.
     void followMotions();
 
     /// Notes where the pointer was when that was asked.

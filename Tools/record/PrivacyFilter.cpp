@@ -10,11 +10,9 @@ namespace Recorder {
 
 namespace {
 
-/// A window manager tells of the window on top a little after keys go to it.
+/// A window manager names the window on top a little after keys go to it.
 constexpr Instant s_lateWindow = 100 * s_millisecond;
-/// An application that answers no question for so long is not trusted.
-constexpr Instant s_longestAnswer = 2 * s_second;
-/// What is told of the focus may be this late.
+/// News of the focus may be this late.
 constexpr Instant s_lateFocus = 250 * s_millisecond;
 
 std::vector<std::regex> expressionsOf(const std::vector<std::string>& patterns) {
@@ -29,7 +27,10 @@ std::vector<std::regex> expressionsOf(const std::vector<std::string>& patterns) 
     return expressions;
 }
 
-bool hasMatch(const std::vector<std::regex>& expressions, const std::string& text) {
+/// The search needs stack for each character of a text, and any program may have a title of any length.
+bool hasMatch(const std::vector<std::regex>& expressions, std::string text) {
+    constexpr std::size_t longest = 4096;
+    text.resize(std::min(text.size(), longest));
     return std::any_of(expressions.begin(), expressions.end(),
                        [&text](const std::regex& expression) { return std::regex_search(text, expression); });
 }

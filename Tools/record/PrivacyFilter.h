@@ -4,6 +4,7 @@
 
 #include "Tools/record/Instant.h"
 
+#include <algorithm>
 #include <cstdint>
 #include <deque>
 #include <optional>
@@ -12,6 +13,9 @@
 #include <vector>
 
 namespace Recorder {
+
+/// An application that answers no question for so long is not trusted.
+inline constexpr Instant s_longestAnswer = 2 * s_second;
 
 enum class KeyMode { Nothing, Shortcuts, Everything };
 
@@ -85,11 +89,14 @@ public:
     /// The window on top has changed.
     void setWindow(Instant instant, bool isDenied) { denied_.set(instant, isDenied); }
 
-    /// From now on the focus has to be known.
-    void requireFocus() { needsFocus_ = true; }
+    /// Says whether the focus has to be known.
+    void requireFocus(bool isNeeded) { needsFocus_ = isNeeded; }
     bool needsFocus() const { return needsFocus_; }
 
-    /// The focus was told at an instant.
+    /// Returns whether it matters which window a key goes to.
+    bool judgesWindows() const { return needsFocus_ || !deniedApps_.empty() || !deniedTitles_.empty(); }
+
+    /// The focus is known since an instant.
     void setFocus(Instant instant, Focus focus) { focus_.set(instant, focus); }
 
     bool isFocusUnknown() const { return focus_.last() == Focus::Unknown; }

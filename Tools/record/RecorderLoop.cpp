@@ -8,12 +8,10 @@
 #include <fmt/core.h>
 #include <poll.h>
 #include <unistd.h>
-#include <xcb/composite.h>
 
-#include <algorithm>
 #include <csignal>
-#include <cstdio>
 #include <exception>
+#include <system_error>
 #include <vector>
 
 namespace Recorder {
@@ -23,18 +21,10 @@ using namespace ZULMetaData;
 namespace {
 
 constexpr Instant s_longestWait = 20 * s_millisecond;
-constexpr Instant s_diskInterval = 100 * s_millisecond;
-constexpr Instant s_askInterval = 50 * s_millisecond;     ///< for the focus, as long as keys wait to be told about
-constexpr Instant s_searchInterval = 200 * s_millisecond; ///< as long as the focus is not known
-constexpr Instant s_statusInterval = s_second / 2;
 constexpr Instant s_busDeadline = 2 * s_second;
-constexpr std::uint64_t s_mebibyte = std::uint64_t{1} << 20;
-constexpr std::uint8_t s_typeBits = 0x7f; ///< of an event's type; the other one says that a client sent it
 
-void say(const std::string& line) {
-    const std::string text = line + "\n";
-    std::fwrite(text.data(), 1, text.size(), stderr);
-    std::fflush(stderr);
+bool isFullDisk(std::error_code code) {
+    return code == std::errc::no_space_on_device || code.value() == EDQUOT;
 }
 
 VideoSettings withSize(VideoSettings settings, const Area& area) {
@@ -69,8 +59,9 @@ struct RecorderLoop::Observers {
 RecorderLoop::RecorderLoop(const Options& options)
     : options_(options), connection_(options.display), target_(captureTargetOf(connection_, options)),
       grabber_(options.display, target_.area, target_.window), clock_(options.display),
-      privacy_(options.keys, options.deniedApps, options.deniedTitles), control_(options.socket),
-      folder_(options.output) {
+      privacy_(options.keys, options.deniedApps, options.deniedTitles),
+      focus_(options.display, privacy_, [this](const std::string& sentence) { warn(sentence); }),
+      control_(options.socket), folder_(options.output) {
     try {
         reachAccessibility();
         open();
@@ -84,18 +75,29 @@ RecorderLoop::RecorderLoop(const Options& options)
 
 RecorderLoop::~RecorderLoop() = default;
 
+void RecorderLoop::warn(const std::string& sentence) {
+    status_.say("zulm record: " + sentence);
+}
+
 void RecorderLoop::reachAccessibility() {
-    if (options_.withoutAccessibility)
-        return;
-    accessibility_ = std::make_unique<AccessibilityProcess>(options_.display);
-    if (accessibility_->waitUntilReady(now() + s_busDeadline)) {
-        privacy_.requireFocus();
-        return;
+    if (!options_.withoutAccessibility) {
+        const FocusWatch::Bus bus = focus_.reach(now() + s_busDeadline);
+        if (options_.keys == KeyMode::Everything && bus != FocusWatch::Bus::Ready)
+            throw Refusal(
+                "--keys all: the accessibility bus does not answer, so passwords could not be told from other "
+                "texts; start it, or add --without-accessibility to record passwords as well");
+        if (bus == FocusWatch::Bus::Late)
+            warn("the accessibility bus does not answer yet: keys are left out until it does");
     }
-    accessibility_.reset();
-    if (options_.keys == KeyMode::Everything)
-        throw Refusal("--keys all: the accessibility bus does not answer, so passwords could not be told from other "
-                      "texts; start it, or add --without-accessibility to record passwords as well");
+    if (privacy_.judgesWindows())
+        freeKeys_.emplace(options_.display);
+}
+
+void RecorderLoop::lostEntry(const Error& loss) {
+    if (isFullDisk(loss.code()))
+        isDiskFull_ = true;
+    else
+        fail(loss.what());
 }
 
 void RecorderLoop::open() {
@@ -107,12 +109,16 @@ void RecorderLoop::open() {
         return folder_.releaseReserve();
     };
     writer_ = std::make_unique<VideoWriter>(folder_.movie(), settings, makeRoom);
-    journal_ = std::make_unique<Journal>(folder_.folder(), [this] { isDiskFull_ = true; });
+    journal_ = std::make_unique<Journal>(folder_.folder(), [this](const Error& loss) { lostEntry(loss); });
     input_ = std::make_unique<HeldInput>(*journal_, privacy_);
-    const auto changed = [this](Instant instant, std::uint32_t process) { windowChanged(instant, process); };
+    const auto changed = [this](Instant instant, std::uint32_t process) {
+        focus_.windowChanged(instant, process);
+        if (observers_)
+            observers_->keys.windowChanged();
+    };
     XConnection& x = connection_;
     const TrafficObserver::Events traffic{
-        [this](std::uint32_t time, std::uint8_t key) { observers_->keys.pressed(key, time); },
+        [this](std::uint32_t time, std::uint8_t key) { observers_->keys.repeated(key, time); },
         [this](std::uint32_t time, bool isHidden) { observers_->cursor.hidden(time, isHidden); }};
     observers_ = std::unique_ptr<Observers>(new Observers{{x, clock_, *journal_},
                                                           {x, clock_, *journal_, *input_},
@@ -123,7 +129,7 @@ void RecorderLoop::open() {
     const Area& area = target_.area;
     journal_->note<RecordingRegionKind>(now(), Rect(area.x, area.y, area.width, area.height));
     selectInput();
-    hover();
+    focus_.follow(observers_->windows, observers_->pointer);
     const CameraEvents events{
         [this](Instant zero) { mailbox_.post([zero](Mailbox::Mail& mail) { mail.started = zero; }); },
         [this](Instant instant, Position pointer) {
@@ -133,7 +139,7 @@ void RecorderLoop::open() {
     camera_ = std::make_unique<Camera>(grabber_, *writer_, settings, events);
 }
 
-/// Raw events come whoever else takes the keys and clicks.
+/// Raw events also come while another program takes the keys and clicks.
 void RecorderLoop::selectInput() {
     if (!connection_.has(xcb_input_id))
         throw Refusal("the X display has no XInput extension, without which clicks and keys cannot be recorded");
@@ -162,28 +168,34 @@ int RecorderLoop::run() {
         sound_->start(*camera_, *writer_, [this](const std::string& why) {
             mailbox_.post([&](Mailbox::Mail& mail) { mail.failure = why; });
         });
-    while (!end_)
-        observe();
+    try {
+        while (!end_)
+            observe();
+    } catch (const std::exception& error) {
+        fail(error.what());
+    }
     signals_.endAtNext(folder_.folder());
-    const bool isSaved = save();
-    if (hasStatus_)
-        say("");
-    if (!error_.empty())
-        say("zulm record: " + error_);
-    if (*end_ == End::Disk)
-        say(fmt::format("zulm record: the file system is full: the recording was ended{}",
-                        isSaved ? ", and what there was is saved" : ""));
-    if (camera_->dropped() > 0)
-        say(fmt::format("zulm record: {} of {} frames were dropped; record fewer of them with --fps, or a smaller part "
-                        "with --region",
-                        camera_->dropped(), camera_->dropped() + camera_->frames()));
+    const Outcome outcome = save();
+    tellEnd(outcome);
     if (options_.json)
-        report(isSaved);
-    control_.tellEnd(isSaved ? "saved" : "kept");
-    if (!isSaved)
+        report(outcome);
+    control_.tellEnd(outcome == Outcome::Saved ? "saved" : "kept");
+    if (outcome == Outcome::Kept)
         say(folder_.folder().string());
-    const bool isWell = isSaved && *end_ != End::Disk && *end_ != End::Error && error_.empty();
+    const bool isWell = outcome == Outcome::Saved && *end_ != End::Disk && *end_ != End::Error && error_.empty();
     return isWell ? ExitFine : ExitLoss;
+}
+
+void RecorderLoop::tellEnd(Outcome outcome) {
+    if (!error_.empty())
+        warn(error_);
+    if (*end_ == End::Disk)
+        warn(fmt::format("the file system is full: the recording was ended{}",
+                         outcome == Outcome::Saved ? ", and what there was is saved" : ""));
+    if (camera_->dropped() > 0)
+        warn(fmt::format("{} of {} frames were dropped; record fewer of them with --fps, or a smaller part with "
+                         "--region",
+                         camera_->dropped(), camera_->dropped() + camera_->frames()));
 }
 
 void RecorderLoop::observe() {
@@ -191,7 +203,7 @@ void RecorderLoop::observe() {
     takeEvents();
     observers_->traffic.serve();
     takeMail();
-    takeFocus();
+    focus_.serve(input_->hasKeys());
     takeSignals();
     control_.serve([this](Command command) { return obey(command); });
     if (end_)
@@ -213,10 +225,9 @@ void RecorderLoop::waitForSomething() {
     wait(mailbox_.descriptor());
     wait(signals_.descriptor());
     wait(observers_->traffic.descriptor()); // poll ignores a negative one
+    wait(focus_.descriptor());
     for (const int descriptor : control_.descriptors())
         wait(descriptor);
-    if (accessibility_)
-        wait(accessibility_->descriptor());
     connection_.flush();
     poll(waits.data(), waits.size(), static_cast<int>(s_longestWait / s_millisecond));
 }
@@ -231,7 +242,7 @@ void RecorderLoop::takeEvents() {
 }
 
 void RecorderLoop::takeEvent(const xcb_generic_event_t& event) {
-    const std::uint8_t type = event.response_type & s_typeBits;
+    const std::uint8_t type = event.response_type & s_eventTypeBits;
     if (type == observers_->keys.firstEvent()) {
         observers_->keys.keyboardChanged(event);
     } else if (type == observers_->cursor.firstEvent() + XCB_XFIXES_CURSOR_NOTIFY) {
@@ -247,11 +258,10 @@ void RecorderLoop::takeEvent(const xcb_generic_event_t& event) {
     } else if (type == XCB_MAPPING_NOTIFY) {
         if (reinterpret_cast<const xcb_mapping_notify_event_t&>(event).request == XCB_MAPPING_POINTER)
             observers_->pointer.buttonsRemapped();
-    } else if (type == XCB_DESTROY_NOTIFY || type == XCB_UNMAP_NOTIFY) {
+    } else if (type == XCB_DESTROY_NOTIFY) {
         const xcb_window_t window = reinterpret_cast<const xcb_destroy_notify_event_t&>(event).window;
-        if (type == XCB_DESTROY_NOTIFY)
-            observers_->windows.destroyed(window);
-        if (options_.stopsOnClose && window == target_.watched && type == XCB_DESTROY_NOTIFY)
+        observers_->windows.destroyed(window);
+        if (options_.stopsOnClose && window == target_.watched)
             end(End::Window, now());
     }
 }
@@ -267,15 +277,20 @@ void RecorderLoop::takeInput(const xcb_ge_generic_event_t& event) {
                        event.event_type == XCB_INPUT_RAW_BUTTON_PRESS, buttonModifiers());
         break;
     case XCB_INPUT_RAW_KEY_PRESS: takeKey(reinterpret_cast<const xcb_input_raw_key_press_event_t&>(event)); break;
-    case XCB_INPUT_DEVICE_CHANGED: pointer.devicesChanged(); break;
+    case XCB_INPUT_DEVICE_CHANGED:
+        pointer.devicesChanged();
+        pointer.buttonsRemapped();
+        break;
     default: break;
     }
 }
 
 void RecorderLoop::takeKey(const xcb_input_raw_key_press_event_t& event) {
     constexpr std::uint32_t highestCode = 255;
-    if (event.detail <= highestCode)
-        observers_->keys.pressed(static_cast<std::uint8_t>(event.detail), event.time);
+    if (event.detail > highestCode)
+        return;
+    const bool isFree = !freeKeys_ || (freeKeys_->has(event.detail, event.time) && observers_->windows.hasFocus());
+    observers_->keys.pressed(static_cast<std::uint8_t>(event.detail), event.time, !isFree);
 }
 
 /// Clicks call the key Command that keys call Windows.
@@ -293,7 +308,7 @@ void RecorderLoop::takeMail() {
     for (const Mailbox::Sight& sight : mail.sights)
         observers_->pointer.saw(sight.instant, sight.pointer);
     if (!mail.sights.empty())
-        hover();
+        focus_.hover();
     if (!mail.failure.empty())
         fail(mail.failure);
 }
@@ -301,10 +316,9 @@ void RecorderLoop::takeMail() {
 void RecorderLoop::began(Instant zero) {
     zero_ = zero;
     journal_->start(zero);
-    disk_ = std::make_unique<DiskSync>(folder_.folder());
+    sync_ = std::make_unique<DiskSync>(folder_.folder());
     journal_->note<CursorActionKind>(zero, s_noButtonYet);
-    if (options_.duration)
-        camera_->stopAt(endOfDuration());
+    limitDuration();
     say("recording " + options_.output.string());
 }
 
@@ -313,55 +327,11 @@ Instant RecorderLoop::endOfDuration() const {
     return *zero_ + paused_ + static_cast<Instant>(*options_.duration * static_cast<double>(s_second));
 }
 
-void RecorderLoop::hover() {
-    const std::optional<Position> pointer = observers_->pointer.position();
-    if (!pointer || pointer == hovered_)
+void RecorderLoop::limitDuration() {
+    if (!options_.duration || end_)
         return;
-    const bool asks = accessibility_ && observers_->windows.process() != 0;
-    if (asks && !accessibility_->askHover(*pointer))
-        return; // until the earlier question is answered, even if the pointer rests from now on
-    hovered_ = pointer;
-    if (!asks)
-        observers_->windows.hover(now(), *pointer);
-}
-
-void RecorderLoop::windowChanged(Instant instant, std::uint32_t process) {
-    privacy_.setFocus(instant, Focus::Unknown);
-    hovered_.reset();
-    if (!accessibility_)
-        return;
-    accessibility_->windowChanged(process);
-    accessibility_->ask(0);
-}
-
-void RecorderLoop::takeFocus() {
-    if (!accessibility_)
-        return;
-    const AccessibilityEvents events{[this](std::uint32_t process, Focus focus) {
-                                         if (process == observers_->windows.process())
-                                             privacy_.setFocus(now(), focus);
-                                     },
-                                     [this](Instant asked, Focus focus) {
-                                         privacy_.setFocus(now(), focus);
-                                         if (focus != Focus::Unknown)
-                                             privacy_.confirm(asked);
-                                     },
-                                     [this](const std::optional<Area>& area) {
-                                         if (area)
-                                             observers_->windows.noteHover(now(), *area);
-                                         else if (const auto pointer = observers_->pointer.position())
-                                             observers_->windows.hover(now(), *pointer);
-                                     },
-                                     [this] { privacy_.setFocus(now(), Focus::Unknown); }};
-    accessibility_->serve(events);
-    if (!accessibility_->isAlive()) { // the focus stays unknown; what the pointer is over is asked of the server
-        accessibility_.reset();
-        return;
-    }
-    if (input_->hasKeys())
-        accessibility_->ask(s_askInterval);
-    else if (privacy_.isFocusUnknown())
-        accessibility_->ask(s_searchInterval);
+    camera_->stopAt(endOfDuration());
+    journal_->endAt(endOfDuration());
 }
 
 void RecorderLoop::takeSignals() {
@@ -372,41 +342,55 @@ void RecorderLoop::takeSignals() {
             if (end_ == End::Signal)
                 StopSignals::endAtOnce(signal->number, folder_.folder());
             const Instant instant = now();
-            if (signal->isFromTerminal)
-                input_->dropInterruptKey();
-            else
-                input_->dropTrigger(instant);
+            dropTrigger(instant, signal->isFromTerminal);
             end(End::Signal, instant);
         }
     }
+}
+
+/// The click or key that led to this may have arrived since the last look.
+void RecorderLoop::dropTrigger(Instant instant, bool isFromTerminal) {
+    takeEvents();
+    if (isFromTerminal)
+        input_->dropInterruptKey(instant);
+    else
+        input_->dropTrigger(instant);
 }
 
 std::string RecorderLoop::obey(Command command) {
     const Instant instant = now();
     switch (command) {
     case Command::Pause:
-        if (!pausedAt_ && zero_) {
-            pausedAt_ = instant;
-            camera_->pause(instant);
-            journal_->pause(instant);
-        }
+        if (!zero_)
+            return s_tooEarly;
+        if (!pausedAt_)
+            pause(instant);
         return "paused";
     case Command::Resume:
-        if (pausedAt_) {
-            paused_ += instant - *pausedAt_;
-            pausedAt_.reset();
-            camera_->resume(instant);
-            if (options_.duration)
-                camera_->stopAt(endOfDuration());
-            journal_->resume(instant);
-        }
+        if (pausedAt_)
+            resume(instant);
         return "resumed";
     case Command::Stop: break;
     }
-    takeEvents(); // the click or key that led to this may have arrived since
-    input_->dropTrigger(instant);
+    dropTrigger(instant, false);
     end(End::Stop, instant);
     return "stopping";
+}
+
+void RecorderLoop::pause(Instant instant) {
+    dropTrigger(instant, false);
+    pausedAt_ = instant;
+    camera_->pause(instant);
+    journal_->pause(instant);
+    journal_->endAt(std::nullopt);
+}
+
+void RecorderLoop::resume(Instant instant) {
+    paused_ += instant - *pausedAt_;
+    pausedAt_.reset();
+    camera_->resume(instant);
+    journal_->resume(instant);
+    limitDuration();
 }
 
 void RecorderLoop::end(End why, Instant instant) {
@@ -414,6 +398,7 @@ void RecorderLoop::end(End why, Instant instant) {
         return;
     end_ = why;
     endInstant_ = pausedAt_.value_or(instant);
+    journal_->endAt(endInstant_);
 }
 
 void RecorderLoop::fail(const std::string& why) {
@@ -428,99 +413,85 @@ void RecorderLoop::lookAfterTime() {
         end(End::Duration, endOfDuration());
 }
 
-/// Ends the recording while it can still be saved: streams are copied into the movie, and its index grows.
+/// Ends the recording while it can still be saved.
 void RecorderLoop::lookAfterDisk() {
-    const Instant instant = now();
-    if (isDiskFull_) {
-        end(End::Disk, instant);
-        return;
-    }
-    if (instant < nextDiskCheck_)
-        return;
-    nextDiskCheck_ = instant + s_diskInterval;
-    constexpr std::uint64_t bytesOfFrame = 40;
-    if (instant >= nextRate_) {
-        nextRate_ = instant + s_second;
-        fastest_ = std::max(writer_->bytes() - ratedBytes_, fastest_ / 2);
-        ratedBytes_ = writer_->bytes();
-    }
-    // The reserve also holds what is on its way to the disk when another program takes all that was free.
-    const std::uint64_t needed =
-        2 * s_mebibyte + 2 * fastest_ + journal_->bytes() * 2 + camera_->frames() * bytesOfFrame;
-    if (!folder_.reserve(needed) || folder_.freeBytes() < s_mebibyte + fastest_)
-        end(End::Disk, instant);
+    if (isDiskFull_ || !disk_.hasRoom({writer_->bytes(), journal_->bytes(), camera_->frames()}))
+        end(End::Disk, now());
 }
 
 void RecorderLoop::showStatus() {
-    const Instant instant = now();
-    if (!zero_ || instant < nextStatus_ || isatty(STDERR_FILENO) == 0)
-        return;
-    nextStatus_ = instant + s_statusInterval;
-    hasStatus_ = true;
-    const auto seconds = static_cast<int>(journal_->timeOf(instant));
-    const auto inMebibytes = [](std::uint64_t bytes) {
-        return static_cast<double>(bytes) / static_cast<double>(s_mebibyte);
-    };
-    const std::string text = fmt::format(
-        "\r{} {:02}:{:02}:{:02}  {} frames, {} dropped  {} entries  movie {:.1f} MiB, streams {:.1f} MiB  ",
-        pausedAt_ ? "paused" : "recording", seconds / 3600, seconds / 60 % 60, seconds % 60, camera_->frames(),
-        camera_->dropped(), journal_->entries(), inMebibytes(writer_->bytes()), inMebibytes(journal_->bytes()));
-    std::fwrite(text.data(), 1, text.size(), stderr);
-    std::fflush(stderr);
+    if (zero_ && status_.isDue())
+        status_.show({pausedAt_.has_value(), journal_->timeOf(now()), camera_->frames(), camera_->dropped(),
+                      journal_->entries(), writer_->bytes(), journal_->bytes()});
 }
 
-/// Keys that wait for the accessibility bus have a little time to be told about.
+/// The accessibility bus has a little time to answer for keys that wait.
 void RecorderLoop::waitForHeldKeys() {
     constexpr Instant longest = 600 * s_millisecond;
     const Instant deadline = now() + longest;
-    while (privacy_.needsFocus() && accessibility_ && input_->hasKeys() && now() < deadline) {
+    while (privacy_.needsFocus() && focus_.descriptor() >= 0 && input_->hasKeys() && now() < deadline) {
         waitForSomething();
-        takeFocus();
+        focus_.serve(input_->hasKeys());
         input_->release();
     }
 }
 
-bool RecorderLoop::save() {
+/// Does one step of the ending. A step that fails keeps no other from being done.
+template <class Step>
+bool RecorderLoop::attempt(Step step) {
+    try {
+        step();
+        return true;
+    } catch (const std::exception& error) {
+        addError(error.what());
+        return false;
+    }
+}
+
+void RecorderLoop::addError(const std::string& sentence) {
+    if (error_.find(sentence) == std::string::npos)
+        error_ += (error_.empty() ? "" : "; ") + sentence;
+}
+
+RecorderLoop::Outcome RecorderLoop::save() {
     camera_->stopAt(endInstant_);
-    takeEvents();
-    if (isDiskFull_ || *end_ == End::Disk)
-        folder_.releaseReserve();
-    waitForHeldKeys();
-    const auto attempt = [this](auto work) {
-        try {
-            work();
-            return true;
-        } catch (const std::exception& error) {
-            error_ += (error_.empty() ? "" : "; ") + std::string(error.what());
-            return false;
-        }
-    };
+    folder_.releaseReserve(); // what is in memory needs space, too
+    attempt([this] {
+        takeEvents();
+        waitForHeldKeys();
+    });
     sound_.reset();
-    disk_.reset();
+    sync_.reset();
     attempt([this] { camera_->finish(endInstant_); });
+    attempt([this] { finishStreams(); });
+    if (!zero_) {
+        addError("the recording ended before its first frame, so there is no movie");
+        folder_.remove();
+        return Outcome::Nothing;
+    }
+    return attempt([this] { makeMovie(); }) ? Outcome::Saved : Outcome::Kept;
+}
+
+void RecorderLoop::finishStreams() {
     takeMail();
     input_->releaseAll(endInstant_);
     journal_->session().finish();
-    if (!zero_) {
-        if (error_.empty())
-            error_ = "the recording ended before its first frame";
-        folder_.remove();
-        return false;
-    }
-    return attempt([this] {
-        folder_.releaseReserve();
-        const FileHandle movie(::open(folder_.movie().c_str(), O_RDWR | O_CLOEXEC));
-        FragmentedMovie(movie.get(), folder_.movie().string()).makeOrdinary(movie.get());
-        journal_->session().saveInto(folder_.movie(), "zulm record", ZULM_VERSION);
-        folder_.publish();
-        folder_.remove();
-    });
+    if (const Error* loss = journal_->session().loss(); loss && *end_ != End::Disk)
+        addError(loss->what());
 }
 
-void RecorderLoop::report(bool isSaved) const {
+void RecorderLoop::makeMovie() {
+    const FileHandle movie(::open(folder_.movie().c_str(), O_RDWR | O_CLOEXEC));
+    FragmentedMovie(movie.get(), folder_.movie().string()).makeOrdinary(movie.get());
+    journal_->session().saveInto(folder_.movie(), "zulm record", ZULM_VERSION);
+    folder_.publish();
+    folder_.remove();
+}
+
+void RecorderLoop::report(Outcome outcome) const {
     Report report;
-    report.movie = isSaved ? options_.output.string() : "";
-    report.folder = isSaved ? "" : folder_.folder().string();
+    report.movie = outcome == Outcome::Saved ? options_.output.string() : "";
+    report.folder = outcome == Outcome::Kept ? folder_.folder().string() : "";
     report.frames = writer_->frames();
     report.duration = journal_->timeOf(endInstant_);
     report.dropped = camera_->dropped();

@@ -2,12 +2,14 @@
 
 // A recording from its start to its end.
 
-#include "Tools/record/AccessibilityProcess.h"
 #include "Tools/record/Camera.h"
 #include "Tools/record/CaptureTarget.h"
 #include "Tools/record/ControlSocket.h"
 #include "Tools/record/CursorObserver.h"
 #include "Tools/record/DiskSync.h"
+#include "Tools/record/DiskWatch.h"
+#include "Tools/record/FocusWatch.h"
+#include "Tools/record/FreeKeys.h"
 #include "Tools/record/HeldInput.h"
 #include "Tools/record/Journal.h"
 #include "Tools/record/KeyObserver.h"
@@ -17,12 +19,13 @@
 #include "Tools/record/PointerObserver.h"
 #include "Tools/record/RecordingFolder.h"
 #include "Tools/record/SoundSource.h"
+#include "Tools/record/StatusLine.h"
 #include "Tools/record/StopSignals.h"
 #include "Tools/record/TrafficObserver.h"
 #include "Tools/record/WindowObserver.h"
+#include "ZULMetaDataSession/Error.h"
 
 #include <atomic>
-#include <exception>
 #include <memory>
 #include <optional>
 #include <string>
@@ -45,8 +48,16 @@ private:
     /// Observers of the display, which live as long as something is recorded.
     struct Observers;
 
+    /// What has become of the recording.
+    enum class Outcome {
+        Saved,
+        Kept,    ///< in the folder
+        Nothing, ///< there is nothing to keep
+    };
+
     void reachAccessibility();
     void open();
+    void lostEntry(const ZULMetaData::Error& loss);
     void selectInput();
     void observe();
     void waitForSomething();
@@ -57,22 +68,29 @@ private:
     ZULMetaData::Modifiers buttonModifiers() const;
     void takeMail();
     void takeSignals();
-    void takeFocus();
     void began(Instant zero);
     void lookAfterDisk();
     void lookAfterTime();
     void showStatus();
-    void hover();
-    void pause();
-    void resume();
+    void pause(Instant instant);
+    void resume(Instant instant);
     std::string obey(Command command);
-    void windowChanged(Instant instant, std::uint32_t process);
+    void dropTrigger(Instant instant, bool isFromTerminal);
+    Instant endOfDuration() const;
+    void limitDuration();
+
     void fail(const std::string& why);
     void end(End why, Instant instant);
     void waitForHeldKeys();
-    bool save();
-    void report(bool isSaved) const;
-    Instant endOfDuration() const;
+    template <class Step>
+    bool attempt(Step step);
+    void addError(const std::string& sentence);
+    Outcome save();
+    void finishStreams();
+    void makeMovie();
+    void tellEnd(Outcome outcome);
+    void report(Outcome outcome) const;
+    void warn(const std::string& sentence);
 
     Options options_;
     XConnection connection_;
@@ -81,9 +99,12 @@ private:
     ScreenGrabber grabber_;
     ServerClock clock_;
     PrivacyFilter privacy_;
-    std::unique_ptr<AccessibilityProcess> accessibility_;
+    StatusLine status_;
+    FocusWatch focus_;
+    std::optional<FreeKeys> freeKeys_; ///< if it matters which window a key goes to
     ControlSocket control_;
     RecordingFolder folder_;
+    DiskWatch disk_{folder_};
     std::atomic<bool> isDiskFull_ = false;
     Mailbox mailbox_;
     std::unique_ptr<VideoWriter> writer_;
@@ -91,8 +112,8 @@ private:
     std::unique_ptr<HeldInput> input_;
     std::unique_ptr<Observers> observers_;
     std::unique_ptr<Camera> camera_;
-    std::unique_ptr<DiskSync> disk_;
-    std::unique_ptr<SoundSource> sound_; ///< of which nothing is there without --audio
+    std::unique_ptr<DiskSync> sync_;
+    std::unique_ptr<SoundSource> sound_; ///< only with --audio
 
     std::optional<End> end_;
     Instant endInstant_ = 0;
@@ -100,14 +121,7 @@ private:
     std::optional<Instant> zero_;
     Instant paused_ = 0;
     std::optional<Instant> pausedAt_;
-    std::optional<Position> hovered_;
-    Instant nextDiskCheck_ = 0;
-    Instant nextRate_ = 0;
-    std::uint64_t ratedBytes_ = 0; ///< of the movie when its rate was taken last
-    std::uint64_t fastest_ = 0;    ///< bytes that the movie grew by in a second
     std::uint8_t inputOpcode_ = 0;
-    Instant nextStatus_ = 0;
-    bool hasStatus_ = false;
 };
 
 } // namespace Recorder

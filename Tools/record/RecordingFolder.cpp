@@ -32,6 +32,22 @@ void requireAbsent(const fs::path& path, const char* advice) {
         throw Refusal(fmt::format("{}: exists already; {}", path.string(), advice));
 }
 
+/// A second name never replaces a file.
+bool renameByLink(const fs::path& from, const fs::path& to) {
+    return link(from.c_str(), to.c_str()) == 0 && unlink(from.c_str()) == 0;
+}
+
+/// Replaces a file that nobody else can have made. File systems without links need it.
+bool renameOverOwnFile(const fs::path& from, const fs::path& to) {
+    const FileHandle own(open(to.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
+    if (!own || rename(from.c_str(), to.c_str()) == 0)
+        return static_cast<bool>(own);
+    const int error = errno;
+    unlink(to.c_str());
+    errno = error;
+    return false;
+}
+
 bool isFull(int error) {
     return error == ENOSPC || error == EDQUOT;
 }
@@ -122,15 +138,11 @@ bool removeRecording(const fs::path& folder) {
 void renameWithoutReplacing(const fs::path& from, const fs::path& to) {
     if (renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE) == 0)
         return;
-    int error = errno;
-    if (error == EINVAL || error == ENOSYS) { // a file system that cannot do it: a second name never replaces either
-        if (link(from.c_str(), to.c_str()) == 0) {
-            unlink(from.c_str());
-            return;
-        }
-        error = errno;
-    }
-    throw Failure(fmt::format("{}: cannot be made from {}: {}", to.string(), from.string(), std::strerror(error)),
+    const bool isUnable = errno == EINVAL || errno == ENOSYS; // the file system
+    if (isUnable && (renameByLink(from, to) || renameOverOwnFile(from, to)))
+        return;
+    throw Failure(fmt::format("{}: cannot be made: {}; the movie is whole in {}", to.string(), std::strerror(errno),
+                              from.string()),
                   ExitLoss);
 }
 

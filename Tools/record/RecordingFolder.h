@@ -28,7 +28,7 @@ public:
     /// Makes the reserve at least this large. Returns false if the file system has no room for it.
     bool reserve(std::uint64_t bytes);
 
-    /// Gives the reserve back to the file system. Returns false if that has happened before.
+    /// Returns the reserve to the file system. Returns false if that has happened before.
     bool releaseReserve();
 
     /// Returns how many bytes the file system has left, beside the reserve.

@@ -4,6 +4,7 @@
 #include "Tools/record/FileHandle.h"
 #include "Tools/record/FragmentedMovie.h"
 #include "Tools/record/RecordingFolder.h"
+#include "Tools/record/StatusLine.h"
 #include "ZULMetaData/ByteSource.h"
 #include "ZULMetaData/StreamEntries.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
@@ -14,6 +15,7 @@
 #include <fcntl.h>
 #include <fmt/core.h>
 #include <sys/file.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -40,9 +42,8 @@ constexpr std::string_view s_suffix = ".recording";
 constexpr double s_pictureLate = 1.2; ///< seconds by which the picture may end before the streams
 constexpr double s_streamsLate = 2.5; ///< seconds by which the usage of the processor may end before the picture
 
-void say(const std::string& line) {
-    const std::string text = "zulm record: " + line + "\n";
-    std::fwrite(text.data(), 1, text.size(), stderr);
+void warn(const std::string& line) {
+    say("zulm record: " + line);
 }
 
 fs::path withoutSlash(const fs::path& folder) {
@@ -58,14 +59,38 @@ fs::path usualOutput(const fs::path& folder) {
     return name.substr(0, name.size() - s_suffix.size());
 }
 
+bool isLocked(const FileHandle& file) {
+    return file && flock(file.get(), LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK;
+}
+
 /// Throws `Refusal` if the recorder of the folder is alive.
 void requireDead(const fs::path& folder) {
-    const FileHandle lock(open((folder / "session.lock").c_str(), O_RDONLY | O_CLOEXEC));
-    if (lock && flock(lock.get(), LOCK_EX | LOCK_NB) != 0 && errno == EWOULDBLOCK)
+    const FileHandle lock(open((folder / "session.lock").c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+    if (isLocked(lock))
         throw Refusal(fmt::format("{}: is being recorded; end that with 'zulm record --stop'", folder.string()));
 }
 
-/// Copies what of the movie can be played.
+/// Returns a lock that keeps other recoveries of the folder away. Throws `Refusal` if there is one.
+FileHandle locked(const fs::path& folder) {
+    FileHandle handle(open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    if (isLocked(handle))
+        throw Refusal(
+            fmt::format("{}: is being recovered by another process; wait until it has ended", folder.string()));
+    return handle;
+}
+
+FileHandle openMovie(const fs::path& path) {
+    FileHandle movie(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK)); // a pipe would wait for a writer
+    struct stat status {};
+    if (!movie || fstat(movie.get(), &status) != 0)
+        throw Failure(
+            fmt::format("{}: cannot be opened: {}; change who may read it", path.string(), std::strerror(errno)));
+    if (!S_ISREG(status.st_mode))
+        throw Failure(fmt::format("{}: is no file, so no recorder has made it; name another folder", path.string()));
+    return movie;
+}
+
+/// Copies the part of the movie that can be played.
 void copyWhole(int from, int to, std::uint64_t bytes, const std::string& name) {
     std::vector<char> buffer(std::size_t{1} << 20);
     for (std::uint64_t done = 0; done < bytes;) {
@@ -84,7 +109,7 @@ void copyWhole(int from, int to, std::uint64_t bytes, const std::string& name) {
     }
 }
 
-/// What of a recording was found.
+/// What was found of a recording.
 struct Findings {
     std::vector<StreamSource> streams;
     std::vector<fs::path> files; ///< of the streams
@@ -93,15 +118,15 @@ struct Findings {
     bool hasLoss = false;
 
     void lose(const std::string& what) {
-        say(what);
+        warn(what);
         hasLoss = true;
     }
 };
 
-bool isMissingKind(const std::string& name) {
-    static constexpr std::array everyRecordingHas{"recordingRegion", "recordingScaleFactor", "systemData",
-                                                  "topmostWindow",   "topmostWindowTitle",   "topmostAppName"};
-    return std::find(everyRecordingHas.begin(), everyRecordingHas.end(), name) != everyRecordingHas.end();
+bool isInEveryRecording(const std::string& name) {
+    static constexpr std::array names{"recordingRegion",    "recordingScaleFactor", "systemData",   "topmostWindow",
+                                      "topmostWindowTitle", "topmostAppName",       "cursorAction", "cursorOpacity"};
+    return std::find(names.begin(), names.end(), name) != names.end();
 }
 
 /// Takes every stream file that has a whole entry. A kind that every recording begins with must be there.
@@ -112,7 +137,7 @@ Findings streamsIn(const fs::path& folder) {
         const fs::path file = folder / (name + ".dat");
         std::error_code error;
         if (!fs::exists(file, error)) {
-            if (isMissingKind(name))
+            if (isInEveryRecording(name))
                 findings.lose(fmt::format("{}: is missing", file.string()));
             return;
         }
@@ -125,7 +150,7 @@ Findings streamsIn(const fs::path& folder) {
                 findings.lastTime = std::max(findings.lastTime, track.times().back());
                 if (std::is_same_v<Kind, CPUUsageKind>)
                     findings.lastUsage = track.times().back();
-            } else if (isMissingKind(name)) {
+            } else if (isInEveryRecording(name)) {
                 findings.lose(fmt::format("{}: has no whole entry", file.string()));
             }
         } catch (const std::exception& problem) {
@@ -155,15 +180,16 @@ bool haveSameBytes(const fs::path& left, const fs::path& right) {
     }
 }
 
-/// Removes a file that is not finished.
+/// A file of its own name, which is removed unless it was renamed.
 class Draft {
 public:
-    explicit Draft(fs::path path) : path_(std::move(path)) {
-        std::error_code ignored;
-        fs::remove(path_, ignored); // of a recovery that was killed
-        file_ = FileHandle(open(path_.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
+    explicit Draft(const fs::path& beside) {
+        std::string name = beside.string() + ".XXXXXX";
+        file_ = FileHandle(mkostemp(name.data(), O_CLOEXEC));
         if (!file_)
-            throw Failure(fmt::format("{}: cannot be created: {}", path_.string(), std::strerror(errno)));
+            throw Failure(
+                fmt::format("{}: cannot be created: {}; name another place with -o", name, std::strerror(errno)));
+        path_ = name;
     }
     ~Draft() { unlink(path_.c_str()); }
     Draft(const Draft&) = delete;
@@ -199,7 +225,7 @@ bool holdsAll(const fs::path& file, const std::vector<fs::path>& streamFiles) {
             return entries && holds(movie, *entries);
         });
     } catch (const std::exception& problem) {
-        say(problem.what());
+        warn(problem.what());
         return false;
     }
 }
@@ -222,8 +248,8 @@ void requireSaved(const fs::path& folder, const fs::path& output) {
 
 void removeRecovered(const fs::path& folder) {
     if (!removeRecording(folder))
-        say(fmt::format("{}: was kept, because it holds more than the recording did; look at what is left in it",
-                        folder.string()));
+        warn(fmt::format("{}: was kept, because it holds more than the recording did; look at what is left in it",
+                         folder.string()));
 }
 
 /// Throws `Refusal` if the movie to make would be among the files that it is made from.
@@ -234,19 +260,52 @@ void requireOutside(const fs::path& folder, const fs::path& output) {
             fmt::format("{}: is in the folder of the recording; name another place with -o", output.string()));
 }
 
+/// The picture and the streams of a recording end at about the same time.
+void compareEnds(const fs::path& folder, const FragmentedMovie& fragments, Findings& findings) {
+    if (findings.lastTime > fragments.duration() + s_pictureLate)
+        findings.lose(fmt::format("{}: ends {:.1f} s before the streams", (folder / "movie.mp4").string(),
+                                  findings.lastTime - fragments.duration()));
+    if (fragments.duration() > findings.lastUsage + s_streamsLate)
+        findings.lose(fmt::format("{}: its streams end {:.1f} s before the picture", folder.string(),
+                                  fragments.duration() - findings.lastUsage));
+}
+
+/// Makes an ordinary movie with its streams in `draft`.
+void makeMovie(const FileHandle& movie, const FragmentedMovie& fragments, const std::string& name,
+               const Findings& findings, const Draft& draft) {
+    copyWhole(movie.get(), draft.get(), fragments.wholeBytes(), name);
+    FragmentedMovie(draft.get(), name).makeOrdinary(draft.get());
+    const SafeMovieSave save(draft.path());
+    if (!findings.streams.empty())
+        save.attach(findings.streams);
+    save.stamp("zulm record", ZULM_VERSION);
+}
+
+/// Renames the draft, unless an earlier call has made the same movie.
+void publish(const Draft& draft, const fs::path& output) {
+    std::error_code error;
+    if (!fs::exists(fs::symlink_status(output, error)))
+        renameWithoutReplacing(draft.path(), output);
+    else if (!haveSameBytes(draft.path(), output))
+        throw Refusal(fmt::format("{}: exists and is another movie; name another one with -o", output.string()));
+    syncFolder(output.parent_path());
+}
+
 } // namespace
 
 int recover(const fs::path& givenFolder, const fs::path& givenOutput, bool deletesFolder) {
     const fs::path folder = withoutSlash(givenFolder);
     const fs::path output = givenOutput.empty() ? usualOutput(folder) : givenOutput;
     std::error_code error;
-    const bool hasOutput = fs::exists(fs::symlink_status(output, error));
     if (!fs::is_directory(folder, error)) {
-        if (hasOutput)
+        if (fs::exists(fs::symlink_status(output, error)))
             return ExitFine; // an earlier call has made it and removed the folder
-        throw Failure(fmt::format("{}: no such folder", folder.string()));
+        throw Failure(fmt::format("{}: there is no such folder; name one that a recorder left, such as "
+                                  "Talk.mp4.recording",
+                                  folder.string()));
     }
     requireDead(folder);
+    const FileHandle lock = locked(folder);
     requireOutside(folder, output);
     const fs::path source = folder / "movie.mp4";
     if (!fs::exists(fs::symlink_status(source, error))) {
@@ -255,34 +314,15 @@ int recover(const fs::path& givenFolder, const fs::path& givenOutput, bool delet
             removeRecovered(folder);
         return ExitFine;
     }
-    const FileHandle movie(open(source.c_str(), O_RDONLY | O_CLOEXEC));
-    if (!movie)
-        throw Failure(fmt::format("{}: cannot be opened: {}", source.string(), std::strerror(errno)));
+    const FileHandle movie = openMovie(source);
     const FragmentedMovie fragments(movie.get(), source.string());
     Findings findings = streamsIn(folder);
-
-    if (findings.lastTime > fragments.duration() + s_pictureLate)
-        findings.lose(fmt::format("{}: ends {:.1f} s before the streams", source.string(),
-                                  findings.lastTime - fragments.duration()));
-    if (fragments.duration() > findings.lastUsage + s_streamsLate)
-        findings.lose(fmt::format("{}: its streams end {:.1f} s before the picture", folder.string(),
-                                  fragments.duration() - findings.lastUsage));
-
-    Draft draft(output.string() + ".recovering");
-    copyWhole(movie.get(), draft.get(), fragments.wholeBytes(), source.string());
-    FragmentedMovie(draft.get(), source.string()).makeOrdinary(draft.get());
-    const SafeMovieSave save(draft.path());
-    if (!findings.streams.empty())
-        save.attach(findings.streams);
-    save.stamp("zulm record", ZULM_VERSION);
-
+    compareEnds(folder, fragments, findings);
+    const Draft draft(output.string() + ".recovering");
+    makeMovie(movie, fragments, source.string(), findings, draft);
     if (!holdsAll(draft.path(), findings.files))
         findings.lose(fmt::format("{}: cannot be read back; nothing was removed", output.string()));
-    if (hasOutput && !haveSameBytes(draft.path(), output))
-        throw Refusal(fmt::format("{}: exists and is another movie; name another one with -o", output.string()));
-    if (!hasOutput)
-        renameWithoutReplacing(draft.path(), output);
-    syncFolder(output.parent_path());
+    publish(draft, output);
     if (deletesFolder && !findings.hasLoss)
         removeRecovered(folder);
     return findings.hasLoss ? ExitLoss : ExitFine;

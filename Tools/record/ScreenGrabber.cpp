@@ -49,8 +49,10 @@ std::optional<PixelLayout> layoutOf(int bitsPerPixel, const xcb_visualtype_t& vi
 ScreenGrabber::ScreenGrabber(const std::string& display, Area area, xcb_window_t window)
     : connection_(display), area_(area), window_(window) {
     findLayout();
-    if (window_ != XCB_WINDOW_NONE)
+    if (window_ != XCB_WINDOW_NONE) {
         xcb_composite_redirect_window(connection_.get(), window_, XCB_COMPOSITE_REDIRECT_AUTOMATIC);
+        pixmap_ = xcb_generate_id(connection_.get());
+    }
     shareMemory();
 }
 
@@ -107,23 +109,22 @@ void ScreenGrabber::shareMemory() {
     segment_ = segment;
 }
 
-/// The window's pixmap is another one after each change of its size.
+/// A window has another pixmap after each change of its size, and whenever it is shown again. The old one keeps its
+/// last picture and tells nobody, so the pixmap is named anew for each picture.
 xcb_drawable_t ScreenGrabber::drawable() {
     if (window_ == XCB_WINDOW_NONE)
         return connection_.root();
-    const std::optional<Area> area = connection_.areaOf(window_);
-    if (!area)
+    xcb_connection_t* connection = connection_.get();
+    if (pixmapArea_)
+        xcb_free_pixmap(connection, pixmap_);
+    pixmapArea_.reset();
+    const auto nameCookie = xcb_composite_name_window_pixmap_checked(connection, window_, pixmap_);
+    const auto sizeCookie = xcb_get_geometry(connection, pixmap_);
+    const Reply<xcb_generic_error_t> error(xcb_request_check(connection, nameCookie));
+    const Reply<xcb_get_geometry_reply_t> size(xcb_get_geometry_reply(connection, sizeCookie, nullptr));
+    if (error || !size) // it is hidden, or gone
         return XCB_NONE;
-    if (pixmap_ && area->width == pixmapArea_.width && area->height == pixmapArea_.height)
-        return pixmap_;
-    if (pixmap_)
-        xcb_free_pixmap(connection_.get(), pixmap_);
-    pixmap_ = xcb_generate_id(connection_.get());
-    const Reply<xcb_generic_error_t> error(xcb_request_check(
-        connection_.get(), xcb_composite_name_window_pixmap_checked(connection_.get(), window_, pixmap_)));
-    if (error)
-        pixmap_ = XCB_NONE;
-    pixmapArea_ = *area;
+    pixmapArea_ = Area{0, 0, size->width, size->height};
     return pixmap_;
 }
 
@@ -135,7 +136,7 @@ bool ScreenGrabber::notePointer(xcb_query_pointer_cookie_t cookie, GrabbedPictur
     return picture.hasPointer;
 }
 
-/// Returns null if the server cannot tell the pixels.
+/// Returns null if the server does not know the pixels.
 const std::uint8_t* ScreenGrabber::fetch(xcb_drawable_t source, const Area& part) {
     xcb_connection_t* connection = connection_.get();
     const auto x = static_cast<std::int16_t>(part.x);
@@ -165,12 +166,15 @@ const std::uint8_t* ScreenGrabber::padded(const std::uint8_t* pixels, const Area
 }
 
 std::optional<GrabbedPicture> ScreenGrabber::grab() {
+    // Some events come to every client.
+    while (const Reply<xcb_generic_event_t> event{xcb_poll_for_queued_event(connection_.get())}) {
+    }
     const xcb_drawable_t source = drawable();
     if (source == XCB_NONE)
         return std::nullopt;
     Area part = area_;
-    if (source != connection_.root())
-        part = {0, 0, std::min(area_.width, pixmapArea_.width), std::min(area_.height, pixmapArea_.height)};
+    if (pixmapArea_)
+        part = {0, 0, std::min(area_.width, pixmapArea_->width), std::min(area_.height, pixmapArea_->height)};
     GrabbedPicture picture;
     picture.bytesPerLine = bytesPerLine_;
     const Instant asked = now();

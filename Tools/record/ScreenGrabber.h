@@ -38,7 +38,6 @@ public:
     ScreenGrabber& operator=(const ScreenGrabber&) = delete;
 
     PixelLayout layout() const { return layout_; }
-    bool usesSharedMemory() const { return segment_ != 0; }
 
     /// Takes a picture. Returns nothing if the area cannot be read now, such as a window that is hidden. A window that
     /// became smaller has black at its right and below it.
@@ -61,8 +60,8 @@ private:
     XConnection connection_;
     Area area_;
     xcb_window_t window_;
-    xcb_pixmap_t pixmap_ = 0; ///< what the window shows, even where others cover it
-    Area pixmapArea_;
+    xcb_pixmap_t pixmap_ = 0;        ///< what the window shows, even where others cover it
+    std::optional<Area> pixmapArea_; ///< nothing while the window has no pixmap
     PixelLayout layout_ = PixelLayout::BGRX32;
     int bitsPerPixel_ = 0;
     int padOfLines_ = 0; ///< bits

@@ -11,13 +11,6 @@ constexpr int s_attempts = 5;
 constexpr Instant s_interval = 10 * s_second;      ///< in which no clock drifts far
 constexpr Instant s_sameClock = 5 * s_millisecond; ///< a distance that is none, but the ticks of the server
 
-/// Returns the whole time whose lower 32 bits are these milliseconds, as near to `about` as can be.
-Instant unwrapped(std::uint32_t milliseconds, Instant about) {
-    const auto present = static_cast<std::uint64_t>(about / s_millisecond);
-    const auto difference = static_cast<std::int32_t>(milliseconds - static_cast<std::uint32_t>(present));
-    return (static_cast<Instant>(present) + difference) * s_millisecond;
-}
-
 } // namespace
 
 ServerClock::ServerClock(const std::string& display)
@@ -28,12 +21,12 @@ ServerClock::ServerClock(const std::string& display)
     synchronize();
 }
 
-/// A change of a property is told with its time.
+/// The event of a changed property has the time of the change.
 std::uint32_t ServerClock::askTime() {
     xcb_change_property(connection_.get(), XCB_PROP_MODE_REPLACE, window_, property_, XCB_ATOM_STRING, 8, 0, nullptr);
     connection_.flush();
     while (const Reply<xcb_generic_event_t> event{xcb_wait_for_event(connection_.get())}) {
-        if ((event->response_type & 0x7f) == XCB_PROPERTY_NOTIFY)
+        if ((event->response_type & s_eventTypeBits) == XCB_PROPERTY_NOTIFY)
             return reinterpret_cast<const xcb_property_notify_event_t*>(event.get())->time;
     }
     return 0;

@@ -1,6 +1,7 @@
 #include "Tools/record/SoundSource.h"
 
 #include "Tools/record/Failure.h"
+#include "Tools/record/Releaser.h"
 
 #include <fmt/core.h>
 #include <pulse/context.h>
@@ -22,25 +23,17 @@ namespace {
 constexpr std::size_t s_blockSamples = 480; ///< 10 ms
 /// Sound that is further from its time is moved there at once.
 constexpr std::int64_t s_farAway = s_soundRate / 20;
-/// Sound that stays further from its time is moved there. Single blocks are told less exactly.
+/// Sound that stays further from its time is moved there. The times of single blocks are less exact.
 constexpr double s_tolerance = s_soundRate / 100.0;
 constexpr double s_smoothing = 64; ///< blocks
 constexpr Instant s_longestOpening = 5 * s_second;
 constexpr Instant s_longestTurn = 50 * s_millisecond;
 constexpr Instant s_microsecond = 1000;
 
-template <auto release>
-struct Releaser {
-    template <class T>
-    void operator()(T* object) const {
-        release(object);
-    }
-};
-
 } // namespace
 
-/// The server's own simple interface cannot tell of sound that is recorded before it is heard, as all is that comes
-/// from what other programs play.
+/// The server's own simple interface does not say when sound is heard that is recorded before, such as all sound that
+/// other programs play.
 struct SoundSource::Stream {
     std::unique_ptr<pa_mainloop, Releaser<pa_mainloop_free>> loop{pa_mainloop_new()};
     std::unique_ptr<pa_context, Releaser<pa_context_unref>> context{
@@ -56,7 +49,7 @@ struct SoundSource::Stream {
     bool connect(const std::string& source);
     bool turn();
 
-    /// Returns when the first sample was heard that was not taken yet, or nothing if the server has not told.
+    /// Returns when the first sample was heard that was not taken yet, or nothing if the server has not said so.
     std::optional<Instant> heard() const;
     std::string error() const { return pa_strerror(pa_context_errno(context.get())); }
 
@@ -84,7 +77,7 @@ bool SoundSource::Stream::waitFor(IsReady isReady) {
 
 bool SoundSource::Stream::connect(const std::string& source) {
     const auto isContextReady = [this] { return pa_context_get_state(context.get()) == PA_CONTEXT_READY; };
-    if (pa_context_connect(context.get(), nullptr, PA_CONTEXT_NOFLAGS, nullptr) < 0 || !waitFor(isContextReady))
+    if (pa_context_connect(context.get(), nullptr, PA_CONTEXT_NOAUTOSPAWN, nullptr) < 0 || !waitFor(isContextReady))
         return false;
     const pa_sample_spec spec{PA_SAMPLE_FLOAT32LE, s_soundRate, s_soundChannels};
     constexpr auto fragment = static_cast<std::uint32_t>(s_blockSamples * s_soundChannels * sizeof(float));

@@ -1,5 +1,7 @@
 #include "Tools/record/TrafficObserver.h"
 
+#include "Tools/record/XConnection.h"
+
 #include <X11/Xlib.h>
 #include <X11/Xproto.h>
 #include <X11/extensions/record.h>
@@ -49,10 +51,11 @@ struct TrafficObserver::State {
     void tellHidden(Time time);
 };
 
-/// Xlib would end the program when the display goes away, though there is a recording to save.
+/// Xlib would end the program at an error and when the display goes away, though there is a recording to save.
 void TrafficObserver::State::survive(Display* connection) {
     const auto note = [](Display*, void* self) { static_cast<State*>(self)->isBroken = true; };
-    XSetIOErrorHandler([](Display*) { return 0; }); // which would say so
+    XSetErrorHandler([](Display*, XErrorEvent*) { return 0; }); // such as that of a client that has just ended
+    XSetIOErrorHandler([](Display*) { return 0; });             // which would say so
     XSetIOErrorExitHandler(connection, note, this);
 }
 
@@ -99,7 +102,7 @@ void TrafficObserver::State::take(const XRecordInterceptData& intercepted) {
 
 void TrafficObserver::State::takeKey(const xEvent& event) {
     const std::uint8_t key = event.u.u.detail;
-    const bool isPress = (event.u.u.type & 0x7f) == KeyPress;
+    const bool isPress = (event.u.u.type & s_eventTypeBits) == KeyPress;
     if (isPress && down[key])
         events.keyRepeated(event.u.keyButtonPointer.time, key);
     down[key] = isPress;

@@ -1,6 +1,7 @@
 #include "Tools/record/VideoWriter.h"
 
 #include "Tools/record/Failure.h"
+#include "Tools/record/Releaser.h"
 
 #include <fmt/core.h>
 
@@ -23,16 +24,16 @@ namespace Recorder {
 
 namespace {
 
-template <auto release>
-struct Releaser {
-    template <class T>
-    void operator()(T* object) const {
-        release(&object);
-    }
-};
+void freeEncoder(AVCodecContext* encoder) {
+    avcodec_free_context(&encoder);
+}
 
-using Encoder = std::unique_ptr<AVCodecContext, Releaser<avcodec_free_context>>;
-using Packet = std::unique_ptr<AVPacket, Releaser<av_packet_free>>;
+void freePacket(AVPacket* packet) {
+    av_packet_free(&packet);
+}
+
+using Encoder = std::unique_ptr<AVCodecContext, Releaser<freeEncoder>>;
+using Packet = std::unique_ptr<AVPacket, Releaser<freePacket>>;
 
 std::string textOf(int error) {
     std::array<char, AV_ERROR_MAX_STRING_SIZE> text{};
@@ -130,7 +131,10 @@ void VideoWriter::openPictures() {
     av_opt_set(encoder.priv_data, "tune", "zerolatency", 0);
     av_opt_set(encoder.priv_data, "crf", std::to_string(settings_.quality).c_str(), 0);
     if (const int error = avcodec_open2(&encoder, codec, nullptr); error < 0)
-        fail("the encoder of pictures cannot be started", error);
+        throw Refusal(
+            fmt::format("--codec {}: the encoder cannot be started with pictures of {}x{} pixels and times of "
+                        "1/{} s: {}; 'h264' is the default",
+                        settings_.codec, settings_.width, settings_.height, s_pictureTimescale, textOf(error)));
     output_->pictureStream = avformat_new_stream(output_->format, codec);
     output_->pictureStream->time_base = encoder.time_base;
     output_->pictureStream->avg_frame_rate = encoder.framerate;
@@ -293,10 +297,11 @@ int VideoWriter::writeBytes(const std::uint8_t* bytes, int size) {
     int done = 0;
     while (done < size) {
         const ssize_t count = ::write(file_.get(), bytes + done, static_cast<std::size_t>(size - done));
+        const int error = errno;
         if (count >= 0)
             done += static_cast<int>(count);
-        else if (errno != EINTR && !((errno == ENOSPC || errno == EDQUOT) && onFull_ && onFull_()))
-            return AVERROR(errno);
+        else if (error != EINTR && !((error == ENOSPC || error == EDQUOT) && onFull_ && onFull_()))
+            return AVERROR(error);
     }
     bytes_ += static_cast<std::uint64_t>(size);
     return size;

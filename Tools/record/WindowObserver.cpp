@@ -1,7 +1,5 @@
 #include "Tools/record/WindowObserver.h"
 
-#include "ZULMetaDataBridge/Source/EntryTexts.h"
-
 #include <algorithm>
 #include <utility>
 
@@ -13,21 +11,6 @@ namespace {
 
 Rect rectOf(const Area& area) {
     return {area.x, area.y, area.width, area.height};
-}
-
-/// Returns a text of a property of type STRING, which is ISO 8859-1, as UTF-8.
-std::string fromLatin1(const std::string& text) {
-    std::string result;
-    for (const char letter : text) {
-        const auto byte = static_cast<unsigned char>(letter);
-        if (byte < 0x80) {
-            result += letter;
-        } else {
-            result += static_cast<char>(0xc0 | byte >> 6);
-            result += static_cast<char>(0x80 | (byte & 0x3f));
-        }
-    }
-    return result;
 }
 
 std::string upToZero(const std::string& text) {
@@ -70,8 +53,7 @@ xcb_window_t WindowObserver::focusedWindow() const {
         return XCB_NONE;
     if (reply->focus != XCB_INPUT_FOCUS_POINTER_ROOT && reply->focus != connection_.root())
         return reply->focus;
-    const auto pointerCookie = xcb_query_pointer(connection_.get(), connection_.root());
-    const Reply<xcb_query_pointer_reply_t> pointer(xcb_query_pointer_reply(connection_.get(), pointerCookie, nullptr));
+    const auto pointer = connection_.pointer();
     return pointer ? pointer->child : xcb_window_t{XCB_NONE};
 }
 
@@ -91,6 +73,19 @@ void WindowObserver::follow(Instant instant) {
     readWindow(instant);
 }
 
+/// Keys go to one window in the application's, or to the frame around it.
+bool WindowObserver::hasFocus() const {
+    if (client_ == XCB_NONE)
+        return true;
+    for (xcb_window_t window = focusedWindow(); window != XCB_NONE && window != connection_.root();) {
+        if (window == client_ || window == frame_ || window == active_)
+            return true;
+        const auto tree = connection_.treeOf(window);
+        window = tree ? tree->parent : xcb_window_t{XCB_NONE};
+    }
+    return false;
+}
+
 /// Returns the window with the application's class: `window`, one around it, or one in it.
 xcb_window_t WindowObserver::clientIn(xcb_window_t window) const {
     const auto hasClass = [this](xcb_window_t candidate) {
@@ -99,12 +94,10 @@ xcb_window_t WindowObserver::clientIn(xcb_window_t window) const {
     for (xcb_window_t outer = window; outer != XCB_NONE && outer != connection_.root();) {
         if (hasClass(outer))
             return outer;
-        const auto cookie = xcb_query_tree(connection_.get(), outer);
-        const Reply<xcb_query_tree_reply_t> tree(xcb_query_tree_reply(connection_.get(), cookie, nullptr));
+        const auto tree = connection_.treeOf(outer);
         outer = tree ? tree->parent : xcb_window_t{XCB_NONE};
     }
-    const auto cookie = xcb_query_tree(connection_.get(), window);
-    const Reply<xcb_query_tree_reply_t> tree(xcb_query_tree_reply(connection_.get(), cookie, nullptr));
+    const auto tree = connection_.treeOf(window);
     if (!tree)
         return window;
     const xcb_window_t* children = xcb_query_tree_children(tree.get());
@@ -114,9 +107,9 @@ xcb_window_t WindowObserver::clientIn(xcb_window_t window) const {
 }
 
 void WindowObserver::readWindow(Instant instant) {
-    const std::uint32_t nothing = XCB_EVENT_MASK_NO_EVENT;
+    const std::uint32_t itsEnd = XCB_EVENT_MASK_STRUCTURE_NOTIFY; // which may be that of the recording
     if (client_ != XCB_NONE)
-        xcb_change_window_attributes(connection_.get(), client_, XCB_CW_EVENT_MASK, &nothing);
+        xcb_change_window_attributes(connection_.get(), client_, XCB_CW_EVENT_MASK, &itsEnd);
     client_ = active_ == XCB_NONE ? xcb_window_t{XCB_NONE} : clientIn(active_);
     frame_ = XCB_NONE;
     process_ = 0;
@@ -136,11 +129,10 @@ void WindowObserver::readTexts(Instant instant) {
     std::string title;
     std::string app;
     if (client_ != XCB_NONE) {
-        xcb_atom_t type = XCB_ATOM_NONE;
         if (const auto name = connection_.text(client_, nameAtom_))
             title = upToZero(*name);
-        else if (const auto oldName = connection_.text(client_, XCB_ATOM_WM_NAME, &type))
-            title = type == XCB_ATOM_STRING ? fromLatin1(upToZero(*oldName)) : upToZero(*oldName);
+        else if (const auto oldName = connection_.text(client_, XCB_ATOM_WM_NAME))
+            title = upToZero(*oldName);
         app = classOf(connection_.text(client_, XCB_ATOM_WM_CLASS).value_or(""));
     }
     const bool isDenied = privacy_.denies(app, title);

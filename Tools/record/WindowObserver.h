@@ -30,10 +30,13 @@ public:
     /// Notes what the pointer hovers over.
     void hover(Instant instant, Position pointer);
 
-    /// Notes a rectangle that the accessibility bus told.
+    /// Notes a rectangle that the accessibility bus knows.
     void noteHover(Instant instant, const Area& area);
 
     std::uint32_t process() const { return process_; }
+
+    /// Returns whether the window on top, if there is one, has the input focus now.
+    bool hasFocus() const;
 
 private:
     bool isManaged();

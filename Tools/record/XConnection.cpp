@@ -1,10 +1,36 @@
 #include "Tools/record/XConnection.h"
 
 #include "Tools/record/Failure.h"
+#include "ZULMetaDataBridge/Source/EntryTexts.h"
 
 #include <fmt/core.h>
 
+#include <cstdlib>
+#include <string_view>
+
 namespace Recorder {
+
+namespace {
+
+/// Returns the bytes of a property as UTF-8. Programs may write anything, so U+FFFD stands for each byte that belongs
+/// to no character.
+std::string utf8Of(std::string_view bytes, xcb_atom_t type) {
+    if (type == XCB_ATOM_STRING)
+        return ZULMetaData::utf8FromLatin1(bytes);
+    std::string text;
+    while (!bytes.empty()) {
+        const std::size_t valid = ZULMetaData::validUTF8Length(bytes);
+        text += bytes.substr(0, valid);
+        bytes.remove_prefix(valid);
+        if (!bytes.empty()) {
+            text += "\xef\xbf\xbd";
+            bytes.remove_prefix(1);
+        }
+    }
+    return text;
+}
+
+} // namespace
 
 XConnection::XConnection(const std::string& display) {
     int number = 0;
@@ -67,21 +93,28 @@ std::vector<std::uint32_t> XConnection::numbers(xcb_window_t window, xcb_atom_t 
     return {values, values + xcb_get_property_value_length(reply.get()) / 4};
 }
 
-std::optional<std::string> XConnection::text(xcb_window_t window, xcb_atom_t property, xcb_atom_t* type) const {
+std::optional<std::string> XConnection::text(xcb_window_t window, xcb_atom_t property) const {
     const auto cookie = xcb_get_property(connection_, 0, window, property, XCB_GET_PROPERTY_TYPE_ANY, 0, 16384);
     const Reply<xcb_get_property_reply_t> reply(xcb_get_property_reply(connection_, cookie, nullptr));
     if (!reply || reply->format != 8)
         return std::nullopt;
-    if (type)
-        *type = reply->type;
     const auto* bytes = static_cast<const char*>(xcb_get_property_value(reply.get()));
-    return std::string(bytes, static_cast<std::size_t>(xcb_get_property_value_length(reply.get())));
+    return utf8Of({bytes, static_cast<std::size_t>(xcb_get_property_value_length(reply.get()))}, reply->type);
+}
+
+Reply<xcb_query_tree_reply_t> XConnection::treeOf(xcb_window_t window) const {
+    return Reply<xcb_query_tree_reply_t>(
+        xcb_query_tree_reply(connection_, xcb_query_tree(connection_, window), nullptr));
+}
+
+Reply<xcb_query_pointer_reply_t> XConnection::pointer() const {
+    return Reply<xcb_query_pointer_reply_t>(
+        xcb_query_pointer_reply(connection_, xcb_query_pointer(connection_, root()), nullptr));
 }
 
 xcb_window_t XConnection::topLevelOf(xcb_window_t window) const {
     for (;;) {
-        const Reply<xcb_query_tree_reply_t> tree(
-            xcb_query_tree_reply(connection_, xcb_query_tree(connection_, window), nullptr));
+        const auto tree = treeOf(window);
         if (!tree)
             return XCB_WINDOW_NONE;
         if (tree->parent == root() || tree->parent == XCB_WINDOW_NONE)

@@ -6,6 +6,7 @@
 
 #include <xcb/xcb.h>
 
+#include <cstdint>
 #include <cstdlib>
 #include <memory>
 #include <optional>
@@ -21,6 +22,8 @@ struct FreeDeleter {
 /// A reply or an event of the server, which xcb allocates.
 template <class T>
 using Reply = std::unique_ptr<T, FreeDeleter>;
+
+inline constexpr std::uint8_t s_eventTypeBits = 0x7f; ///< the other bit says that a client has sent the event
 
 class XConnection {
 public:
@@ -49,11 +52,17 @@ public:
     /// Returns whether the server has an extension.
     bool has(xcb_extension_t& extension) const;
 
-    /// Return the value of a property; empty if there is none.
+    /// Return the value of a property; empty if there is none. Texts are valid UTF-8.
     ///@{
     std::vector<std::uint32_t> numbers(xcb_window_t window, xcb_atom_t property) const;
-    std::optional<std::string> text(xcb_window_t window, xcb_atom_t property, xcb_atom_t* type = nullptr) const;
+    std::optional<std::string> text(xcb_window_t window, xcb_atom_t property) const;
     ///@}
+
+    /// Returns the parent and the children of a window; null if it is gone.
+    Reply<xcb_query_tree_reply_t> treeOf(xcb_window_t window) const;
+
+    /// Returns where the pointer is; null if the server is gone.
+    Reply<xcb_query_pointer_reply_t> pointer() const;
 
     /// Returns the child of the root window that holds `window`, which may be the window itself.
     xcb_window_t topLevelOf(xcb_window_t window) const;

@@ -10,6 +10,8 @@ extern "C" {
 #include <libavutil/log.h>
 }
 
+#include <sys/resource.h>
+
 #include <cstdio>
 #include <exception>
 
@@ -17,7 +19,14 @@ namespace Recorder {
 
 namespace {
 
+/// Keys that wait or are left out are in memory, and an image of it would be a file.
+void keepMemoryOffTheDisk() {
+    const rlimit nothing{0, 0};
+    setrlimit(RLIMIT_CORE, &nothing);
+}
+
 int record(const Options& options) {
+    keepMemoryOffTheDisk();
     VideoWriter::requireCodec(options.video.codec);
     RecorderLoop loop(options);
     return loop.run();

@@ -42,6 +42,7 @@ void addRetimeCommand(CLI::App& app, Action& chosen);
 void addRedactCommand(CLI::App& app, Action& chosen);
 void addExtractCommand(CLI::App& app, Action& chosen);
 void addSalvageCommand(CLI::App& app, Action& chosen);
+void addExportCommand(CLI::App& app, Action& chosen);
 void addConvertCommand(CLI::App& app, Action& chosen);
 void addDemoCommand(CLI::App& app, Action& chosen);
 void addRecordCommand(CLI::App& app, Action& chosen);

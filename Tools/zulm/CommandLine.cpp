@@ -36,7 +36,7 @@ const std::vector<CommandGroup> s_commandGroups{
     {"Change",
      {addAttachCommand, addStampCommand, addRetimeCommand, addCutCommand, addRedactCommand, addCompactCommand,
       addDetachCommand}},
-    {"Convert", {addExtractCommand, addConvertCommand}},
+    {"Convert", {addExtractCommand, addConvertCommand, addExportCommand}},
     {"Show", {addRenderCommand, addGuideCommand}},
     {"Try", {addDemoCommand}}};
 

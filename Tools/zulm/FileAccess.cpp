@@ -4,6 +4,7 @@
 
 #include <fmt/core.h>
 
+#include <algorithm>
 #include <filesystem>
 #include <system_error>
 #include <unistd.h>
@@ -51,8 +52,18 @@ mode_t allowedBy(const struct stat& input, gid_t group) {
 
 FileAccess::FileAccess(const std::string& path, const std::vector<std::string>& inputs) : replaced_(statusOf(path)) {
     for (const std::string& input : inputs)
-        if (const auto status = statusOfInput(input); status && S_ISREG(status->st_mode))
-            inputs_.push_back(*status);
+        addInput(input);
+}
+
+void FileAccess::addInput(const std::string& input) {
+    const auto status = statusOfInput(input);
+    if (!status || !S_ISREG(status->st_mode))
+        return;
+    const auto isSame = [&](const struct stat& known) {
+        return known.st_mode == status->st_mode && known.st_gid == status->st_gid;
+    };
+    if (std::none_of(inputs_.begin(), inputs_.end(), isSame))
+        inputs_.push_back(*status);
 }
 
 void FileAccess::applyTo(const std::string& file) const {

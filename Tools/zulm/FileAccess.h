@@ -14,6 +14,12 @@ public:
     /// The output `path` may exist, and is replaced then. Inputs are named as on the command line.
     FileAccess(const std::string& path, const std::vector<std::string>& inputs);
 
+    /// The output is a new file. Inputs are added.
+    FileAccess() = default;
+
+    /// Adds one more input, which takes memory only if none has had its permissions.
+    void addInput(const std::string& input);
+
     /// Gives `file` the permissions of the output, as far as its file system and the process can. Whatever fails leaves
     /// fewer permissions, never more.
     void applyTo(const std::string& file) const;

@@ -39,6 +39,7 @@ constexpr std::uint64_t s_mostEmbedded = std::uint64_t{360} << 20;
 
 constexpr std::string_view s_elementStart = "<script type=\"application/json\" id=\"zulm-recording\">";
 constexpr std::string_view s_metaDataStart = "<script type=\"text/plain\" id=\"zulm-metadata\">";
+constexpr std::string_view s_recordingId = "id=\"zulm-recording\"";
 constexpr std::string_view s_elementEnd = "</script>\n";
 constexpr std::string_view s_place = "</head>";
 
@@ -60,7 +61,14 @@ std::string pageFor(const ViewOptions& options) {
 struct PageParts {
     explicit PageParts(const ViewOptions& options) : text(pageFor(options)), place(text.find(s_place)) {
         if (place == std::string::npos)
-            throw Failure(fmt::format("{}: is no page: it holds no {}", options.page, s_place));
+            throw Failure(
+                fmt::format("{}: is not a page of the viewer, since it has no {}; name the page that zulm was "
+                            "built with",
+                            options.page, s_place));
+        if (text.find(s_recordingId) != std::string::npos)
+            throw Failure(fmt::format("{}: holds a recording already; name the page that zulm was built with, or leave "
+                                      "out --page",
+                                      options.page));
     }
     std::string_view front() const { return std::string_view(text).substr(0, place); }
     std::string_view back() const { return std::string_view(text).substr(place); }

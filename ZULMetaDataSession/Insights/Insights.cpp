@@ -4,26 +4,50 @@
 #include "ZULMetaDataSession/RecordingStates.h"
 
 #include <algorithm>
+#include <cstddef>
 #include <optional>
+#include <span>
+#include <vector>
 
 namespace ZULMetaData {
 
 namespace {
 
-constexpr double s_longestDuration = 366.0 * 86400; ///< in seconds; a later time is damaged
+constexpr double s_day = 86400;                     ///< in seconds
+constexpr double s_longestDuration = 366.0 * s_day; ///< a later time is damaged
+constexpr std::size_t s_mostDamaged = 64;           ///< times at the end of each stream that may be damaged
 
-template <class... Kinds>
-double lastTimeOf(const Track<Kinds>&... tracks) {
-    double last = 0;
-    ((last = tracks.empty() ? last : std::max(last, tracks.times().back())), ...);
-    return std::min(last, s_longestDuration);
+/// Returns the last times of all streams in ascending order. Streams that cannot be read have none.
+std::vector<double> lastTimesOf(const Recording& recording) {
+    std::vector<double> last;
+    RecordedKinds::forEach([&]<class Kind>() {
+        try {
+            const std::span<const double> times = recording.track<Kind>().times();
+            const auto looked = times.last(std::min(times.size(), s_mostDamaged));
+            last.insert(last.end(), looked.begin(), looked.end());
+        } catch (const Error&) { // which `insightSourcesOf` reports if it needs the stream
+        }
+    });
+    std::sort(last.begin(), last.end());
+    return last;
 }
 
-double durationOf(const Recording& recording, const InsightSources& sources) {
+/// Returns the last time that is not damaged. A damaged time is later than a day, and ten times as late as all others.
+/// The times are in ascending order.
+double believableEnd(const std::vector<double>& times) {
+    double end = times.empty() ? 0 : times.front();
+    for (const double time : times) {
+        const bool isFar = time > s_day && time > 10 * std::max(1.0, end);
+        if (isFar && time != times.front())
+            break;
+        end = time;
+    }
+    return std::clamp(end, 0.0, s_longestDuration);
+}
+
+double durationOf(const Recording& recording) {
     const double told = recording.duration().value_or(0);
-    return told > 0 ? told
-                    : lastTimeOf(sources.positions, sources.actions, sources.keys, sources.scrolling, sources.windows,
-                                 sources.titles, sources.applications, sources.slides);
+    return told > 0 ? told : believableEnd(lastTimesOf(recording));
 }
 
 } // namespace
@@ -49,7 +73,7 @@ InsightSources insightSourcesOf(const Recording& recording, const Callback<void(
     read(regions);
     if (const std::optional<Rect> region = detail::areaOf(regions, {}).region)
         sources.screen = detail::screenRect(*region);
-    sources.duration = durationOf(recording, sources);
+    sources.duration = durationOf(recording);
     return sources;
 }
 

@@ -65,8 +65,9 @@ struct Insights {
 };
 
 /// Returns what the insights are made of. The screen is the last recorded region that has an area. The duration is that
-/// of the movie; if it tells none, the time of the last entry, at most 366 days. Calls `leaveOut` for every track that
-/// cannot be read, which is empty then.
+/// of the movie. If the movie tells none, it is the time of the last entry of any kind, at most 366 days; a time later
+/// than a day, and ten times as late as all others, is damaged and does not count. Calls `leaveOut` for every track
+/// that cannot be read, which is empty then.
 ZULMETADATA_API InsightSources insightSourcesOf(const Recording& recording,
                                                 const Callback<void(const Error& error)>& leaveOut);
 

@@ -69,10 +69,7 @@ class Reader:
 
     def entries_of(self, path: str) -> _Array | None:
         """Returns the entries of a recording, or None if it has none of this kind."""
-        for stream in _core.RecordingFile(path).streams:
-            if stream.kind == self._kind:
-                return stream.read()
-        return None
+        return _core.read_kind(path, self._kind)
 
     def batches(self, paths: Iterable[str], failures: list[Failure]) -> Iterator[Batch]:
         """Yields a batch for each recording that has entries of the kind."""

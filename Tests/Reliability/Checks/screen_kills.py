@@ -90,6 +90,27 @@ def table(ages):
     return lines
 
 
+def fill(file):
+    """Takes all that is free on a file system."""
+    with open(file, "ab", buffering=0) as filler:
+        try:
+            while True:
+                filler.write(bytes(1 << 16))
+        except OSError:
+            pass
+
+
+def refuse_full_disk(place, screen, result):
+    """Nothing is created on a file system that is full at the start."""
+    fill(place / "filler")
+    before = sorted(path.name for path in place.iterdir())
+    recording = screen.record(name=str(place / "late.mp4"), wait=False)
+    code = recording.process.wait(60)
+    after = sorted(path.name for path in place.iterdir())
+    if code != 1 or after != before:
+        result.failures.append(f"a full disk at the start: ends with {code}, leaves {after} of {before}")
+
+
 def full_disks(context, desk, screen, result):
     """Another program takes all that is free while something is recorded. Needs the right to mount."""
     place = context.folder / "small"
@@ -104,25 +125,24 @@ def full_disks(context, desk, screen, result):
         try:
             recording = screen.record(name=str(place / "full.mp4"))
             time.sleep(random.uniform(1, 3))
-            with open(place / "filler", "wb", buffering=0) as filler:
-                try:
-                    while True:
-                        filler.write(bytes(1 << 16))
-                except OSError:
-                    pass
+            fill(place / "filler")
             full = time.monotonic()
             code = recording.process.wait(60)
             seconds = time.monotonic() - full
             result.cases += 1
             verified = subprocess.run([os.environ["ZULM"], "verify", recording.output], check=False,
                                       capture_output=True).returncode
-            duration = json.loads(recording.json.read_text())["duration"]
+            report = json.loads(recording.json.read_text())
+            duration = report["duration"]
             last = desk.frame_times(recording.output)[-1] if recording.output.exists() else 0
             missing.append(duration - last)
             if code != 3 or verified != 0 or last < duration - 1 or seconds > 20:
                 result.lost += 1
                 result.failures.append(f"full disk {number}: ends with {code} after {seconds:.1f} s, verify {verified}, "
                                        f"{last} of {duration}: {recording.errors()}")
+            if report["stopped_by"] != "disk":
+                result.failures.append(f"full disk {number}: stopped by {report['stopped_by']}")
+            refuse_full_disk(place, screen, result)
         finally:
             subprocess.run(["umount", "-l", place], check=False)
     result.notes.append(f"{len(missing)} full disks: the picture ends at most {max(missing):.2f} s before the recording")

@@ -50,15 +50,6 @@ def type_into_both(desk, entries, result):
     return passwords
 
 
-def start(desk, mode, name):
-    """The bus has to answer within 2 seconds, which a machine with other work to do may miss at first."""
-    for _ in range(5):
-        recording = desk.record("--keys", mode, name=name)
-        if recording.process.poll() is None:
-            return recording
-    raise RuntimeError(recording.errors())
-
-
 def look_at_keys(found, result, where):
     """Returns how often something is recorded that was typed openly."""
     typed = [chr(entry.value[0]) for entry in found.get("keyboardAction", []) if entry.value[0] < 0x110000]
@@ -90,7 +81,7 @@ def record_passwords(modules, application, mode, number, entries, result):
         desk.profile = desk.folder.with_name(desk.folder.name + "-profile")  # not among what the recorder writes
         try:
             APPLICATIONS[application](desk)
-            recording = start(desk, mode, "run.mp4")
+            recording = desk.record_with_bus(mode, "run.mp4")
             time.sleep(1)
             passwords = type_into_both(desk, entries, result)
             desk.xdotool("key", "Tab")

@@ -33,17 +33,10 @@ def act(screen, events, pause):
             screen.xdotool("click", 1)
         time.sleep(pause * random.uniform(0.3, 0.7))
         if index % 4 < 2:
-            screen.xdotool("mousemove", 200 + index % 800, 300 + index % 200)
+            screen.xdotool("mousemove", 200 + 37 * index % 800, 300 + 23 * index % 200)
         else:
             screen.xdotool("mousemove_relative", "--", 3, -2)
         time.sleep(pause * random.uniform(0.3, 0.7))
-
-
-def colour_index(pixel):
-    if all(90 < channel < 170 for channel in pixel):
-        return 7
-    red, green, blue = (channel > 170 for channel in pixel)
-    return red << 2 | green << 1 | blue
 
 
 def drawing_delays(window):
@@ -61,7 +54,7 @@ def latenesses(desk, streams, recording):
     """When each click and key happened, and how much later the first frame shows its colour."""
     kinds = streams.streams_of_movie(recording.output)
     x, y = kinds["topmostWindow"][0].value[:2]
-    colours = [colour_index(frame[:3]) for frame in desk.pixels(recording.output, (x + 600, y + 50, 2, 2))]
+    colours = [desk.colour_index(frame[:3]) for frame in desk.pixels(recording.output, (x + 600, y + 50, 2, 2))]
     times = desk.frame_times(recording.output)
     events = sorted([entry.time for entry in kinds["cursorAction"] if entry.value == 1] +
                     [entry.time for entry in kinds["keyboardAction"]])
@@ -74,6 +67,36 @@ def latenesses(desk, streams, recording):
             break
         found.append((event, times[frame] - event))
     return events, found
+
+
+def moves(kinds):
+    """When the pointer came to each place, with the place and the one before."""
+    entries = kinds["cursorLocation"]
+    return [(entry.time, before.value, entry.value) for before, entry in zip(entries, entries[1:])
+            if entry.value != before.value]
+
+
+def shown_moves(desk, recording, told):
+    """How much later than its entry the first frame shows the marker at each place. A place that the pointer left before
+    the next frame is in none."""
+    left, top, width, height = area = (150, 250, 1000, 350)  # all places of `act`
+    until = [when for when, _, _ in told[1:]] + [float("inf")]
+    found = {}
+    first = 0
+    for shown, frame in zip(desk.frame_times(recording.output), desk.grey_frames(recording.output, area)):
+        while first < len(told) and until[first] < shown - 3 * ONE_FRAME:
+            first += 1
+        for index in range(first, len(told)):
+            when, (old_x, old_y), (x, y) = told[index]
+            if when > shown + 3 * ONE_FRAME:
+                break
+            # A corner of the marker that the one at the place before does not cover.
+            column = x - left + (7 if x >= old_x else -7)
+            row = y - top + (7 if y >= old_y else -7)
+            is_inside = 0 <= column < width and 0 <= row < height
+            if index not in found and is_inside and frame[row * width + column] > 160:
+                found[index] = (when, shown - when)
+    return list(found.values())
 
 
 def slope(points):
@@ -102,6 +125,8 @@ def run(context):
             result.failures.append(recording.errors())
             return result
         told, found = latenesses(desk, streams, recording)
+        moved = moves(streams.streams_of_movie(recording.output))
+        shown = shown_moves(desk, recording, moved)
         delays = drawing_delays(window)
         report = json.loads(recording.json.read_text())
     result.cases = events
@@ -109,8 +134,13 @@ def run(context):
     own = [(when, late - delay) for (when, late), delay in zip(found, delays)]
     result.notes.append(f"{report['frames']} frames in {report['duration']:.0f} s, {report['dropped']} dropped")
     result.notes.append("| picture after its entry | median | 99th percentile | largest | drift in a minute |")
-    for name, points in (("as recorded", found), ("less what the window took to draw it", own)):
+    for name, points in (("as recorded", found), ("less what the window took to draw it", own),
+                         (f"the marker at {len(shown)} of {len(moved)} places of the pointer", shown)):
         result.notes.append(f"| {name} | " + " | ".join(f"{value:.2f} ms" for value in figures(points)) + " |")
+    if len(shown) < (0.9 if context.full else 0.5) * len(moved):
+        result.failures.append(f"the marker is seen at {len(shown)} of {len(moved)} places alone")
+    elif abs(figures(shown)[0]) >= 1000 * ONE_FRAME * (1 if context.full else SHARED):
+        result.failures.append(f"the median of the marker is {figures(shown)[0]:.1f} ms")
     median, most, _, drift = figures(own)
     if abs(median) >= 1000 * ONE_FRAME * (1 if context.full else SHARED):
         result.failures.append(f"the median is {median:.1f} ms")

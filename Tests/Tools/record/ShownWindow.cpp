@@ -4,7 +4,8 @@
 // pixels is drawn where the pointer is. What happens is printed, one line for each event, with its time on the clock of
 // the X server; "drawn COUNT TIME" says when the server had drawn a colour. Lines on standard input change the window:
 // "title TEXT", "class TEXT", "cursor NUMBER", "move X Y", "resize W H", "blank" (a cursor without pixels), "hide" and
-// "show" (the cursor, for all windows), "close".
+// "show" (the cursor, for all windows), "grab" and "ungrab" (the keyboard), "unmap" and
+// "map", "close".
 
 #include <xcb/xcb.h>
 #include <xcb/xfixes.h>
@@ -219,6 +220,15 @@ private:
         xcb_change_window_attributes(connection_, window_, XCB_CW_CURSOR, &cursor);
     }
 
+    /// Takes all keys, as a prompt for a password does.
+    void grabKeyboard() {
+        const auto cookie =
+            xcb_grab_keyboard(connection_, 0, window_, XCB_CURRENT_TIME, XCB_GRAB_MODE_ASYNC, XCB_GRAB_MODE_ASYNC);
+        const std::unique_ptr<xcb_grab_keyboard_reply_t, FreeDeleter> reply(
+            xcb_grab_keyboard_reply(connection_, cookie, nullptr));
+        std::printf("grabbed %d\n", reply ? reply->status : -1);
+    }
+
     void readLine() {
         std::string line;
         if (!std::getline(std::cin, line)) {
@@ -245,6 +255,14 @@ private:
             xcb_xfixes_hide_cursor(connection_, window_);
         else if (what == "show")
             xcb_xfixes_show_cursor(connection_, window_);
+        else if (what == "grab")
+            grabKeyboard();
+        else if (what == "ungrab")
+            xcb_ungrab_keyboard(connection_, XCB_CURRENT_TIME);
+        else if (what == "unmap")
+            xcb_unmap_window(connection_, window_);
+        else if (what == "map")
+            xcb_map_window(connection_, window_);
         else if (what == "move")
             xcb_configure_window(connection_, window_, XCB_CONFIG_WINDOW_X | XCB_CONFIG_WINDOW_Y, two.data());
         else if (what == "resize")

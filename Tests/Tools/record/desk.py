@@ -1,6 +1,5 @@
 """A desk to record: an X server of its own, a window manager, and the window of ShownWindow.cpp."""
 
-import contextlib
 import os
 import pathlib
 import shutil
@@ -8,6 +7,8 @@ import signal
 import subprocess
 import tempfile
 import time
+
+from streams import streams_of_folder
 
 PROGRAMS = {"recorder": os.environ.get("ZULM_RECORD", ""), "window": os.environ.get("SHOWN_WINDOW", ""),
             "zulm": os.environ.get("ZULM", "")}
@@ -108,6 +109,14 @@ class Desk:
     def record(self, *options, name="out.mp4", wait=True):
         return Recording(self, self.folder / name, options, wait)
 
+    def record_with_bus(self, mode, name):
+        """The bus has to answer within 2 seconds, which a machine with other work to do may miss at first."""
+        for _ in range(5):
+            recording = self.record("--keys", mode, name=name)
+            if recording.process.poll() is None:
+                return recording
+        raise RuntimeError(recording.errors())
+
 
 class Window:
     def __init__(self, desk, geometry, managed):
@@ -136,8 +145,13 @@ class Window:
         return [line[1:] for line in words if line and line[0] == kind]
 
     def tell(self, line):
-        self.process.stdin.write(line + "\n")
-        self.process.stdin.flush()
+        """Text is sent as UTF-8, bytes as they are."""
+        self.process.stdin.buffer.write((line if isinstance(line, bytes) else line.encode()) + b"\n")
+        self.process.stdin.buffer.flush()
+
+    def grab_keyboard(self):
+        self.tell("grab")
+        self.desk.wait_for(lambda: self.lines("grabbed"))
 
 
 class Recording:
@@ -153,6 +167,10 @@ class Recording:
         if wait:
             desk.wait_for(lambda: f"recording {output}" in self.errors() or self.process.poll() is not None)
 
+    def entries(self, kind):
+        """The entries of a kind that are in the file by now."""
+        return streams_of_folder(self.folder).get(kind, [])
+
     def errors(self):
         return self.log.read_text(encoding="utf-8")
 
@@ -162,8 +180,18 @@ class Recording:
         self.process.send_signal(number)
         return self.process.wait(60)
 
+    def socket(self):
+        """Where the recorder listens, if it is the only one."""
+        return next(path for path in self.desk.folder.iterdir() if path.is_socket() and "zulm-record-" in path.name)
+
     def control(self, word):
         return self.desk.run(PROGRAMS["recorder"], word)
+
+
+def processes_of(process):
+    """The numbers of the processes that a process has started."""
+    return [int(number) for number in
+            subprocess.run(["pgrep", "-P", str(process.pid)], capture_output=True, text=True, check=False).stdout.split()]
 
 
 def probe(path, *show):
@@ -176,6 +204,25 @@ def frame_times(path):
             probe(path, "-select_streams", "v", "-show_entries", "packet=pts_time") if line]
 
 
+def colour_index(pixel):
+    """Returns which of the eight colours of the window's strip this is."""
+    if all(90 < channel < 170 for channel in pixel):
+        return 7
+    red, green, blue = (channel > 170 for channel in pixel)
+    return red << 2 | green << 1 | blue
+
+
+def grey_frames(path, area):
+    """The brightness of the pixels of an area, frame by frame."""
+    x, y, width, height = area
+    command = ["ffmpeg", "-v", "error", "-i", str(path), "-vf", f"crop={width}:{height}:{x}:{y}", "-fps_mode",
+               "passthrough", "-f", "rawvideo", "-pix_fmt", "gray", "-"]
+    with subprocess.Popen(command, stdout=subprocess.PIPE) as process:
+        while len(frame := process.stdout.read(width * height)) == width * height:
+            yield frame
+        process.stdout.close()
+
+
 def pixels(path, area, size=None):
     """The pixels of an area of each frame, red, green and blue, perhaps shrunk to `size`."""
     x, y, width, height = area
@@ -186,9 +233,3 @@ def pixels(path, area, size=None):
     data = subprocess.run(command, capture_output=True, check=True, timeout=300).stdout
     length = columns * rows * 3
     return [data[start:start + length] for start in range(0, len(data), length)]
-
-
-@contextlib.contextmanager
-def desk(**options):
-    with Desk(**options) as opened:
-        yield opened

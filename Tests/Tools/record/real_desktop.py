@@ -8,7 +8,6 @@ import pathlib
 import re
 import shutil
 import struct
-import subprocess
 import sys
 import textwrap
 
@@ -108,8 +107,7 @@ class Scene:
 
     def __init__(self, desk):
         self.desk = desk
-        bus = desk.start(["dbus-daemon", "--session", "--print-address", "--nofork"], stdout=subprocess.PIPE, text=True)
-        desk.environment["DBUS_SESSION_BUS_ADDRESS"] = bus.stdout.readline().strip()
+        desk.start_bus()
         desk.environment.update(XCURSOR_THEME="Adwaita", GTK_OVERLAY_SCROLLING="0")
         paragraphs = [paragraph for paragraph in TEXT.read_text(encoding="utf-8").split("\n\n") if paragraph[0] != "|"]
         lines = "\n\n".join(textwrap.fill(paragraph, 60) for paragraph in paragraphs)
@@ -157,15 +155,6 @@ class Scene:
 
     def wait_title(self, window, holds):
         self.desk.wait_for(lambda: holds(self.title(window)))
-
-
-def start(desk, movie):
-    """The accessibility bus has to answer within 2 seconds, which a busy machine may miss at first."""
-    for _ in range(5):
-        recording = desk.record("--keys", "all", name=movie)
-        if recording.process.poll() is None:
-            return recording
-    raise RuntimeError(recording.errors())
 
 
 def wait_until_keys_are_recorded(desk, recording):
@@ -324,7 +313,7 @@ def missing_programs():
 def record(desk, name):
     scene = Scene(desk)
     person = Person(desk)
-    recording = start(desk, name)
+    recording = desk.record_with_bus("all", name)
     work(desk, scene, person, recording)
     code = recording.stop()
     if code != 0:

@@ -6,7 +6,7 @@ import { readFileSync, writeFileSync } from 'node:fs';
 import { join } from 'node:path';
 import { test } from 'node:test';
 import { ffmpeg, pixelsOf, settled } from './numbered.mjs';
-import { emptyPage, folder, open, opened, ready, recordedSession, seek, state, textOf, waitUntil, zulm } from './support.mjs';
+import { coloured, emptyPage, folder, open, opened, ready, recordedSession, seek, state, textOf, waitUntil, zulm } from './support.mjs';
 
 const recording = recordedSession();
 const empty = join(folder, 'empty.html');
@@ -22,22 +22,11 @@ async function shown(work, options = {}) {
   await close();
 }
 
-/// How many pixels of the overlay are about of that colour.
-const drawn = (page, colour) =>
-  page.evaluate(([red, green, blue]) => {
-    const canvas = document.getElementById('overlay');
-    const { data } = canvas.getContext('2d').getImageData(0, 0, canvas.width, canvas.height);
-    let count = 0;
-    for (let i = 0; i < data.length; i += 4)
-      if (data[i + 3] > 200 && Math.hypot(data[i] - red, data[i + 1] - green, data[i + 2] - blue) < 24) ++count;
-    return count;
-  }, colour);
-
 const appears = (page, colour) =>
-  waitUntil(() => drawn(page, colour), (count) => count > 20, (count) => `${count} pixels of the colour ${colour}`);
+  waitUntil(() => coloured(page, colour), (count) => count > 20, (count) => `${count} pixels of the colour ${colour}`);
 
 const disappears = (page, colour) =>
-  waitUntil(() => drawn(page, colour), (count) => count < 5, (count) => `${count} pixels of the colour ${colour}`);
+  waitUntil(() => coloured(page, colour), (count) => count < 5, (count) => `${count} pixels of the colour ${colour}`);
 
 /// The objects anywhere in a document that have all these members.
 function objectsWith(value, ...names) {
@@ -53,12 +42,22 @@ for (const [key, colour] of Object.entries(layers))
     shown(async (page) => {
       const zoom = objectsWith(insights, 'start', 'end', 'factor', 'places')[0];
       await seek(page, zoom.places.findLast(({ reason }) => reason === 'clicks').start + 0.7);
-      assert.ok((await drawn(page, colour)) < 5);
+      assert.ok((await coloured(page, colour)) < 5);
       await page.keyboard.press(key);
       await appears(page, colour);
       await page.keyboard.press(key);
       await disappears(page, colour);
     }));
+
+test('a link switches on what the library computes', async () => {
+  const zoom = objectsWith(insights, 'start', 'end', 'factor', 'places')[0];
+  const { page, problems, close } = await open(recording.page, { hash: `#t=${zoom.start + 2}&layers=cursor,zooms` });
+  await opened(page);
+  await ready(page);
+  await appears(page, layers[8]);
+  assert.deepEqual(problems, []);
+  await close();
+});
 
 test('the suggested zoom shows what the camera of the library shows', () =>
   shown(async (page) => {
@@ -91,6 +90,23 @@ test('an offset moves everything, and is kept in the link', () =>
     const before = (await state(page)).hotSpot;
     await page.getByRole('tab', { name: 'Facts' }).click();
     await page.getByRole('button', { name: 'Adjust…' }).click();
+    await page.keyboard.press('Escape');
+    await page.getByRole('tab', { name: 'Entries' }).click();
+    await page.getByLabel('Stream', { exact: true }).selectOption('cursorLocation');
+    await page.getByLabel('Filter entries').fill('x>100');
+    await page.getByRole('button', { name: 'Sort by Y' }).click();
+    await page.evaluate(() => document.activeElement.blur());
+    await page.keyboard.press('+');
+    const kept = () => page.evaluate(() => [
+        document.querySelector('.zoom-text').textContent,
+        document.querySelector('.entries-head select').value,
+        document.querySelector('[aria-sort]')?.textContent,
+        document.querySelector('.entries-status').textContent,
+      ].join());
+    await page.waitForFunction(() => / of /.test(document.querySelector('.entries-status').textContent));
+    const chosen = await kept();
+    await page.getByRole('tab', { name: 'Facts' }).click();
+    await page.getByRole('button', { name: 'Adjust…' }).click();
     await page.getByLabel('Offset in seconds').fill('nothing');
     await page.getByRole('button', { name: 'Apply' }).click();
     assert.ok(await page.locator('#adjust-dialog').isVisible(), 'a word is no number');
@@ -99,6 +115,7 @@ test('an offset moves everything, and is kept in the link', () =>
     await page.locator('#adjust-dialog').waitFor({ state: 'hidden' });
     await page.waitForFunction(() => /offset=-1\.5/.test(location.hash));
     assert.match(await textOf(page, '#pane-facts'), /Offset of times\s+-1\.5 s, set by hand/);
+    await waitUntil(kept, (now) => now === chosen); // the times alone are others
     await seek(page, 3.5);
     assert.deepEqual((await state(page)).hotSpot, before);
     const { hash } = new URL(page.url());
@@ -169,6 +186,14 @@ test('a recording is shown over another movie', async () => {
     const middle = (Math.floor(height * 0.9) * width + Math.floor(width * 0.9)) * channels;
     assert.ok(data[middle + 1] > 2 * data[middle], 'the picture is green');
     assert.equal(await page.evaluate(() => zulmViewer.dump()), before);
+    await page.keyboard.press('End');
+    await page.keyboard.press('i');
+    assert.equal((await state(page)).selection, null, 'nothing comes after the end');
+    await page.getByRole('button', { name: 'Adjust…' }).click();
+    await page.getByRole('button', { name: 'As recorded' }).click();
+    await page.waitForFunction(() => zulmViewer.state().movie === 'ready' && zulmViewer.state().frame.width === 1280);
+    await page.waitForFunction(() => !/offset/.test(location.hash));
+    assert.notEqual((await state(page)).duration, 18);
   });
 });
 

@@ -6,7 +6,7 @@ import { join } from 'node:path';
 import { test } from 'node:test';
 import { deflateSync } from 'node:zlib';
 import { attached, ffmpeg, imageEntry, imagesOf, positionsOf, regionOf, stream } from './numbered.mjs';
-import { drawn, emptyPage, folder, open, opened, ready, recordedSession, seek, setting, state, textOf, waitUntil, zulm } from './support.mjs';
+import { coloured, drawn, emptyPage, folder, open, opened, ready, recordedSession, seek, setting, state, textOf, waitUntil, zulm } from './support.mjs';
 
 const recording = recordedSession();
 const empty = join(folder, 'empty.html');
@@ -33,6 +33,18 @@ test('a file that is no recording is refused in words, and the next one opens', 
   await give(page, text);
   assert.match(await textOf(page, '#notice-text'), /^Letter\.mp4 cannot be shown/);
   assert.equal(await textOf(page, '#recording-name'), 'Recording.mp4'); // stays open
+  assert.equal(await page.evaluate(() => zulmViewer.dump()), zulm('dump', '--format', 'json', 'Recording.mp4'));
+  assert.deepEqual(problems, []);
+  await close();
+});
+
+test('a wrong file does not end what is opening', async () => {
+  const { page, problems, close } = await open(recording.page);
+  await page.setInputFiles('#file-input', { name: 'Letter.mp4', mimeType: 'video/mp4', buffer: Buffer.from('Dear reader') });
+  await opened(page);
+  await page.waitForFunction(() => zulmViewer.state().finished === 2 && !document.body.matches('.is-busy'));
+  assert.match(await textOf(page, '#notice-text'), /^Letter\.mp4 cannot be shown/);
+  assert.equal(await textOf(page, '#recording-name'), 'Recording.mp4');
   assert.equal(await page.evaluate(() => zulmViewer.dump()), zulm('dump', '--format', 'json', 'Recording.mp4'));
   assert.deepEqual(problems, []);
   await close();
@@ -134,6 +146,10 @@ test('one bad time does not stretch the axis, and is told', async () => {
     assert.match(told, /1 entry lies before the beginning of the movie/);
     assert.doesNotMatch(await page.locator('#pane-facts').textContent(), /\d{4}:/, 'nor how long the person was idle');
     assert.match(await textOf(page, '.verdict'), /Nothing is damaged\./);
+    await seek(page, 4);
+    for (const layer of ['8', 'p']) await page.keyboard.press(layer);
+    await waitUntil(() => coloured(page, [47, 191, 155]), (count) => count > 20); // the smooth path
+    assert.equal(await page.locator('#notice').isVisible(), false);
     await close();
   }
   const { page, close } = await open(empty);
@@ -143,6 +159,19 @@ test('one bad time does not stretch the axis, and is told', async () => {
   assert.ok(duration >= 7.9 && duration < 8, `${duration} seconds`);
   assert.match(await findings(page), /1 entry lies [\d,]+ seconds after all others/);
   await close();
+});
+
+test('a rest at the end is idle, in the page that was written and in a file that is dropped', async () => {
+  const still = greyMovie('Still', { cursorLocation: positionsOf(path.slice(0, 30)), recordingRegion: regionOf([0, 0, 0, 640, 360]) });
+  for (const file of [still.page, empty]) {
+    const { page, close } = await open(file, { hash: '#t=0&range=2-8' });
+    if (file === empty) await give(page, still.movie);
+    await opened(page);
+    await page.locator('#pane-facts dd').first().waitFor({ state: 'attached' });
+    assert.match(await page.locator('#pane-facts').textContent(), /Idle0:05 in 1 stretch/);
+    if (file !== empty) await page.waitForFunction(() => /idle 0:05\.1/.test(document.querySelector('.range-facts').textContent));
+    await close();
+  }
 });
 
 test('regions that cannot be right are told', async () => {

@@ -65,6 +65,21 @@ test('a note stands at its time, in the list and in a lane, and in the next visi
   await close();
 });
 
+test('notes belong to the recording, and move with it', async () => {
+  const { page, close } = await open(recording.page, { hash: '#t=0&offset=-1.5' });
+  await opened(page);
+  await page.keyboard.press('b');
+  await note(page, 5, 'here');
+  await page.evaluate(() => (location.hash = '#offset=2'));
+  await page.waitForFunction(() => document.querySelector('.note-time').textContent === '0:08.500');
+  await page.goto(page.url().replace(/#.*/, ''));
+  await page.reload();
+  await opened(page);
+  await page.waitForFunction(() => document.querySelectorAll('.notes li').length === 1);
+  assert.deepEqual(await notes(page), [['0:06.500', 'here']]);
+  await close();
+});
+
 test('notes are saved in three forms, and each is read again', () =>
   opening({}, async (page) => {
     await page.keyboard.press('b');
@@ -152,5 +167,5 @@ test('a link to what is not there shows everything', () =>
   opening({ hash: '#t=900&zoom=9-1&stream=nothing&layers=unknown&filter=' }, async (page) => {
     const { time, duration } = await state(page);
     assert.ok(time <= duration);
-    assert.deepEqual(await shown(page), { stream: '', filter: '', zoom: 'all', heat: false, cursor: false });
+    assert.deepEqual(await shown(page), { stream: '', filter: '', zoom: 'all', heat: false, cursor: true });
   }));

@@ -157,6 +157,15 @@ test('the heat map can tell of the selection alone', () =>
     await page.waitForFunction((whole) => document.getElementById('overlay').toDataURL() !== whole, whole);
     await page.getByRole('button', { name: 'Heat map' }).click();
     await page.waitForFunction((whole) => document.getElementById('overlay').toDataURL() === whole, whole);
+    const heat = page.getByRole('button', { name: 'Heat map' });
+    await heat.click();
+    await page.keyboard.press('7');
+    await page.locator('#heat-legend').waitFor({ state: 'hidden' });
+    assert.equal(await heat.getAttribute('aria-pressed'), 'false', 'the map is hidden, whatever it told of');
+    await heat.click();
+    await page.locator('#heat-legend').waitFor({ state: 'visible' });
+    await heat.click();
+    await page.locator('#heat-legend').waitFor({ state: 'hidden' }); // as it was before
   }));
 
 test('a link holds the selection', async () => {

@@ -192,6 +192,18 @@ export function drawn(page) {
   return page.evaluate(() => new Promise((done) => requestAnimationFrame(() => requestAnimationFrame(done))));
 }
 
+/// How many pixels of the overlay are about of that colour.
+export function coloured(page, colour) {
+  return page.evaluate(([red, green, blue]) => {
+    const canvas = document.getElementById('overlay');
+    const { data } = canvas.getContext('2d').getImageData(0, 0, canvas.width, canvas.height);
+    let count = 0;
+    for (let i = 0; i < data.length; i += 4)
+      if (data[i + 3] > 200 && Math.hypot(data[i] - red, data[i + 1] - green, data[i + 2] - blue) < 24) ++count;
+    return count;
+  }, colour);
+}
+
 /// Reads a value until it is the wanted one, and returns it. `waitForFunction` does not wait for promises.
 export async function waitUntil(read, isWanted = Boolean, words = String) {
   const end = Date.now() + 30_000;

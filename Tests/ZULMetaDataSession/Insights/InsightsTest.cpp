@@ -123,9 +123,30 @@ TEST(Insights, AreReadFromARecording) {
 }
 
 TEST(Insights, LastAtMostAYearIfTheMovieTellsNoDuration) {
-    const MemoryRecording recording(movieOf({actionStream({{1, s_leftDown}, {1e300, s_leftUp}})}));
+    const MemoryRecording recording(movieOf({actionStream({{1e300, s_leftDown}, {1e300, s_leftUp}})}));
     const Insights insights = insightsOf(*recording);
     EXPECT_EQ(insights.duration, 366 * 86400);
+}
+
+TEST(Insights, LastUntilTheLastEntryOfAnyKind) {
+    const std::string cpuUsage = streamHeader("2b7b6a08", 1, 12) + f64(40) + raw(0.5F);
+    const MemoryRecording recording(movieOf({actionStream({{1, s_leftDown}, {2, s_leftUp}}), cpuUsage}));
+    EXPECT_EQ(insightsOf(*recording).duration, 40);
+}
+
+double durationWith(const std::vector<double>& times) {
+    std::vector<std::pair<double, std::int32_t>> entries{{1, s_leftDown}, {8, s_leftUp}};
+    for (const double time : times)
+        entries.emplace_back(time, s_leftDown);
+    const MemoryRecording recording(movieOf({actionStream(entries)}));
+    return insightsOf(*recording).duration;
+}
+
+TEST(Insights, LastNoLongerForADamagedTime) {
+    EXPECT_EQ(durationWith({25.5}), 25.5);
+    EXPECT_EQ(durationWith({1e9}), 8);
+    EXPECT_EQ(durationWith({9, 1e9, 2e9, 1e300}), 9);
+    EXPECT_EQ(durationWith({30000, 50000, 90000, 100000}), 100000);
 }
 
 TEST(Insights, FailIfATrackCannotBeRead) {

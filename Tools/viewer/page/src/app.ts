@@ -1,23 +1,24 @@
 // The page: a recording, a player, and everything that shows where they are.
 
-import { adjustmentIn, asRecorded, isSame, partsOfAdjustment, shifted, type Adjustment } from './adjust/adjustment';
+import { adjustmentIn, asRecorded, isSame, type Adjustment } from './adjust/adjustment';
 import { showAdjusting } from './adjust/dialog';
+import { Address, followLayers, type WholeView } from './address';
 import { Decoder } from './decoder/client';
-import { embeddedRecording, type EmbeddedRecording, type PackedText } from './decoder/embedded';
 import { EntriesPane } from './entries/pane';
 import { showCheck, showFacts } from './facts/pane';
 import { InsightTables } from './insights/tables';
 import type { Range } from './lanes/axis';
 import { arrangeLanes } from './lanes/dialog';
 import { Timeline } from './lanes/timeline';
-import { assumption } from './model/checks';
 import { clock, shown } from './model/format';
 import { decimal } from './model/decimals';
-import { joined, type Joined } from './model/joining';
+import { shortestIdle } from './model/idle';
 import { markerAfter, markerBefore } from './model/markers';
-import { Session, type Decoded } from './model/session';
-import { linkTo, linkToView, partsOf, rangeIn, rangeText, timeInLink, withParts } from './model/link';
+import type { Decoded, Session } from './model/session';
+import { partsOf, rangeIn, rangeText, timeInLink } from './model/link';
+import { Movie, stillProblem } from './movie';
 import { NotesPane } from './notes/pane';
+import { Opening, sessionOf, type Arrival } from './opening';
 import { RangeBar } from './range/bar';
 import { Selection } from './range/selection';
 import { zoomStage } from './stage/handling';
@@ -26,9 +27,9 @@ import { Player } from './stage/player';
 import { Stage } from './stage/stage';
 import { afterIdle } from './transport/skipping';
 import { setUpAutomation } from './ui/automation';
+import { breath } from './ui/breath';
 import { setUpControls, type Controls } from './ui/controls';
 import { ask, setUpDialogs } from './ui/dialogs';
-import { breath } from './ui/breath';
 import { announce, byId, setText } from './ui/dom';
 import { setUpDrop } from './ui/drop';
 import { placeIcons } from './ui/icons';
@@ -39,6 +40,7 @@ import { saveBlob } from './ui/save';
 import { setUpSplitters } from './ui/splitter';
 import { setUpTabs, showTab } from './ui/tabs';
 import { setUpTheme } from './ui/theme';
+import { wordsOf } from './ui/words';
 
 export class App implements Page {
   readonly player = new Player(byId<HTMLVideoElement>('movie'));
@@ -51,25 +53,30 @@ export class App implements Page {
     onProblem: (text) => this.complain(text),
   });
   readonly stage = new Stage(this.player, this.insights);
-  /// As it is recorded, and how the reader says that it belongs to the movie.
+  private readonly opening = new Opening(this.decoder, {
+    onArrival: (arrival) => this.arrive(arrival),
+    onProblem: (text) => this.complain(text),
+  });
+  private readonly address = new Address(() => this.viewToLink());
+  private readonly movie = new Movie();
+  /// What is recorded, and how the reader says that it belongs to the movie.
   private decoded: Decoded | undefined;
   private adjustment = asRecorded;
+  /// Counts the adjustments. The last one holds.
+  private adjusted = 0;
   session: Session | undefined;
-  private movieUrl = '';
-  private movieName = '';
   private isFramePending = false;
   private onlyTimeMoves = false;
   private shownMovie = '';
   private drawnTime = -1;
-  private opened = 0;
   /// The recording whose entries are shown as the address says.
   private linked: Session | undefined;
-  finished = 0;
   private controls!: Controls;
   private readonly timeline: Timeline;
   private readonly entries: EntriesPane;
   private readonly notes: NotesPane;
-  private readonly usualLayers = layersOn();
+  /// Whether the heat map tells of the selection, and whether it was on before.
+  private heat = { isOfSelection: false, wasOn: false };
   private readonly rangeBar: RangeBar;
 
   constructor() {
@@ -81,7 +88,7 @@ export class App implements Page {
       onSeek: (time) => this.seek(time),
       onRange: () => {
         this.rangeChanged();
-        this.writeLink();
+        this.address.write();
       },
       onSelect: (one, other) => this.selection.select(one, other),
       onExtend: (time) => {
@@ -94,7 +101,7 @@ export class App implements Page {
       onSeek: (time) => this.seek(time),
       onSave: () => void this.save(),
       onProblem: (text) => this.complain(text),
-      onChange: () => this.writeLink(),
+      onChange: () => this.address.write(),
     });
     this.notes = new NotesPane({
       time: () => this.player.time,
@@ -108,7 +115,8 @@ export class App implements Page {
     this.rangeBar = new RangeBar(this.selection, {
       insights: (range) => this.insightsIn(range),
       movieName: () => this.fileName(),
-      link: () => location.href.replace(/#.*/, '') + this.link(),
+      hasMovie: () => this.movie.url !== null,
+      link: () => location.href.replace(/#.*/, '') + this.address.linkTo(this.view()),
       onZoom: (range) => this.timeline.setRange(range),
       onFilter: ({ from, to }) => {
         showTab('tab-entries');
@@ -126,7 +134,7 @@ export class App implements Page {
     setUpTabs(() => this.requestFrame());
     setUpSplitters();
     setUpDialogs();
-    setUpDrop((files) => void this.openFiles(files));
+    setUpDrop((files) => void this.opening.openFiles(files));
     this.controls = setUpControls(this);
     setUpKeys(this);
     setUpAutomation(this);
@@ -136,97 +144,31 @@ export class App implements Page {
     });
     byId('notice-close').addEventListener('click', () => void (byId('notice').hidden = true));
     window.addEventListener('hashchange', () => {
-      this.followLink();
+      void this.followLink();
       this.followLinkToEntries();
     });
     this.player.onChange = () => this.playerChanged();
     this.player.onPicture = () => this.pictureChanged();
     this.player.skip = (time) => (this.skipsIdle ? afterIdle(this.session?.idle ?? [], time) : undefined);
-    this.stage.images.onDecoded = () => this.requestFrame();
-    this.openEmbedded();
+    this.stage.images.onDecoded = this.stage.onReady = () => this.requestFrame();
+    this.opening.openEmbedded();
   }
 
-  // Opening
-
-  private openEmbedded(): void {
-    let embedded: EmbeddedRecording | undefined;
-    try {
-      embedded = embeddedRecording();
-    } catch (error) {
-      return this.complain(`This page's recording cannot be read: ${wordsOf(error)}.`);
-    }
-    if (!embedded) return;
-    const { metadata, name, movie, info, verify } = embedded;
-    this.setMovie(movie, movie ?? '');
-    void this.open(metadata, name, (decoded) => ({
-      ...decoded,
-      info,
-      verify,
-      duration: info.duration ?? decoded.duration,
-    }));
+  get finished(): number {
+    return this.opening.finished;
   }
 
-  /// One recording: a movie, or stream files, or both.
-  async openFiles(files: File[]): Promise<void> {
-    let recording: Joined;
-    try {
-      recording = joined(files);
-    } catch (error) {
-      ++this.finished;
-      return this.complain(`The files cannot be opened: ${wordsOf(error)}.`);
-    }
-    const { contents, name, movie } = recording;
-    const url = movie ? URL.createObjectURL(movie) : null;
-    await this.open(contents, name, (decoded) => {
-      this.setMovie(url, movie?.name ?? '');
-      history.replaceState(null, '', linkTo(0)); // the address told a time of the recording before
-      return decoded;
-    });
-    if (url !== null && this.movieUrl !== url) URL.revokeObjectURL(url);
-  }
+  // What is open
 
-  /// What is open stays where the new one cannot be read.
-  private async open(source: Blob | PackedText, name: string, complete: (decoded: Decoded) => Decoded): Promise<void> {
-    const opening = ++this.opened;
-    document.body.classList.add('is-busy');
-    setText(byId('welcome-title'), `Opening ${shown(name)}…`);
-    try {
-      if (source instanceof Blob && source.size === 0) throw new Error('it is empty');
-      const { id, decoded, problems } = await this.decoder.open(source, name);
-      if (opening !== this.opened) return;
-      mark('zulm:decoded');
-      if (decoded.streams.length === 0 && decoded.hidden.length === 0) throw new Error(whyNothing(decoded));
-      byId('notice').hidden = true;
-      await breath(); // each step by itself, so that the page goes on
-      if (opening !== this.opened) return;
-      const completed = complete(decoded);
-      const adjustment = adjustmentIn(location.hash);
-      const session = sessionOf(completed, adjustment);
-      await breath();
-      if (opening !== this.opened) return;
-      [this.decoded, this.adjustment] = [completed, adjustment];
-      this.show(session);
-      this.decoder.keep(id);
-      if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
-    } catch (error) {
-      if (opening !== this.opened) return;
-      this.complain(`${name} cannot be shown: ${wordsOf(error, name)}.`);
-      this.decoder.keep();
-    } finally {
-      if (opening === this.opened) this.isOpened();
-      ++this.finished;
-    }
-  }
-
-  private isOpened(): void {
-    document.body.classList.remove('is-busy');
-    setText(byId('welcome-title'), 'Drop a recording here');
-  }
-
-  private setMovie(url: string | null, name: string): void {
-    if (this.movieUrl.startsWith('blob:')) URL.revokeObjectURL(this.movieUrl);
-    this.movieUrl = url ?? '';
-    this.movieName = name.startsWith('data:') ? '' : name;
+  /// Nothing here waits: what was shown before stays whole until all of the new recording is there.
+  private arrive({ id, decoded, adjustment, session, movie, address, problems }: Arrival): void {
+    this.movie.set(movie);
+    if (address !== undefined) history.replaceState(null, '', address);
+    [this.decoded, this.adjustment] = [decoded, adjustment];
+    ++this.adjusted;
+    this.decoder.keep(id); // what is drawn first may ask it
+    this.show(session);
+    if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
   }
 
   private show(session: Session): void {
@@ -234,21 +176,25 @@ export class App implements Page {
     document.body.classList.remove('is-empty');
     document.title = `${shown(session.name)} – ZULMetaData`;
     setText(byId('recording-name'), shown(session.name));
-    const canHavePictures = session.container !== 'stream';
-    this.player.load(this.movieUrl && canHavePictures ? this.movieUrl : null, session.duration, session.movieDuration === undefined);
-    this.notes.show(session);
+    this.loadMovie(session);
+    this.notes.show(session, this.adjustment.offset);
     this.selection.start(this.player.duration);
     this.showSession(session);
     this.stage.zoom.reset();
     this.selectionChanged();
-    this.followLink();
+    void this.followLink();
     this.frame();
     mark('zulm:first-picture');
-    setTimeout(() => this.showDetails(session));
+    void this.showDetails(session, () => {
+      this.entries.show(session);
+      this.followLinkToEntries();
+    });
   }
 
-  private adjustedSession(): Session {
-    return sessionOf(this.decoded!, this.adjustment);
+  private loadMovie(session: Session): void {
+    const canHavePictures = session.container !== 'stream' || this.movie.isAnother;
+    const isGuessed = session.movieDuration === undefined || this.movie.isAnother;
+    this.player.load(canHavePictures ? this.movie.url : null, session.duration, isGuessed);
   }
 
   private showSession(session: Session): void {
@@ -258,48 +204,54 @@ export class App implements Page {
     this.timeline.show(session, this.player.duration);
   }
 
-  /// The movie goes on, and only what belongs to it changes.
-  private adjust(adjustment: Adjustment): void {
-    if (!this.decoded || isSame(adjustment, this.adjustment)) return;
+  /// Only what belongs to the adjustment changes. The movie goes on unless the reader chooses another one; null is the
+  /// movie of the recording.
+  private async adjust(adjustment: Adjustment, movie?: File | null): Promise<void> {
+    const hasOtherMovie = movie ? true : movie === null && this.movie.isAnother;
+    const { decoded } = this;
+    if (!decoded || (isSame(adjustment, this.adjustment) && !hasOtherMovie)) return;
+    const adjusted = ++this.adjusted;
+    const session = await sessionOf(decoded, adjustment);
+    if (adjusted !== this.adjusted) return;
     this.adjustment = adjustment;
-    const session = this.adjustedSession();
-    this.player.setLength(session.duration, session.movieDuration === undefined);
+    if (movie) this.movie.replace(movie);
+    else if (hasOtherMovie) this.movie.restore();
+    if (hasOtherMovie) this.loadMovie(session);
+    else this.player.setLength(session.duration, session.movieDuration === undefined || this.movie.isAnother);
+    const { zoomed } = this.timeline;
     this.showSession(session);
+    if (zoomed) this.timeline.setRange(zoomed);
+    this.notes.setOffset(adjustment.offset);
     this.selection.setDuration(this.player.duration);
     this.rangeBar.forget();
     this.selectionChanged();
-    this.showDetails(session);
-    this.writeLink();
+    await this.showDetails(session, () => this.entries.showAgain(session));
+    this.address.write();
   }
 
-  /// Shows what is open over another movie.
-  private useMovie(movie: File): void {
-    if (!this.decoded) return;
-    this.setMovie(URL.createObjectURL(movie), movie.name);
-    const { duration: _, ...decoded } = this.decoded;
-    this.decoded = { ...decoded, duration: undefined };
-    const session = this.adjustedSession();
-    this.player.load(this.movieUrl, session.duration, true);
-    this.showSession(session);
-    this.showDetails(session);
-  }
-
-  /// What may come after the first picture.
-  private showDetails(session: Session): void {
-    if (session !== this.session) return;
-    this.entries.show(session);
-    this.followLinkToEntries();
-    showFacts(session, this.player.duration, this.adjustment, {
-      onAdjust: () =>
-        showAdjusting(this.adjustment, {
-          onAdjust: (adjustment) => this.adjust(adjustment),
-          onMovie: (movie) => this.useMovie(movie),
-        }),
-    });
-    showCheck(session, this.player.size);
-    this.requestFrame();
+  /// Shows what may come after the first picture, one part at a time.
+  private async showDetails(session: Session, showEntries: () => void): Promise<void> {
+    const parts = [
+      showEntries,
+      () => this.tellFacts(session),
+      () => showCheck(session, this.player.size),
+      () => this.requestFrame(),
+    ];
+    for (const show of parts) {
+      await breath();
+      if (session !== this.session) return;
+      show();
+    }
+    this.linked = session;
     void this.stage.images.prepare(session.appearances);
     announce(`${shown(session.name)} is open`);
+  }
+
+  private tellFacts(session: Session): void {
+    showFacts(session, this.player.duration, this.adjustment, {
+      onAdjust: () =>
+        showAdjusting(this.adjustment, { onAdjust: (adjustment, movie) => void this.adjust(adjustment, movie) }),
+    });
   }
 
   // Time
@@ -341,39 +293,24 @@ export class App implements Page {
     this.timeline.pan(part);
   }
 
+  // The address
+
   /// Parts that the address lacks change nothing.
-  private followLink(): void {
+  private async followLink(): Promise<void> {
     if (!this.session) return;
     const parts = partsOf(location.hash);
-    if (parts.has('offset') || parts.has('region')) this.adjust(adjustmentIn(location.hash));
+    const adjustment = adjustmentIn(location.hash, this.adjustment);
+    if (!isSame(adjustment, this.adjustment)) await this.adjust(adjustment);
     const zoom = rangeIn(parts.get('zoom'));
     if (zoom) this.timeline.setRange(zoom);
     const time = timeInLink(location.hash);
     if (time !== undefined && Math.abs(time - this.player.time) > 0.0005) this.seek(time);
-    const wanted = parts.get('layers')?.split(',');
-    if (wanted) for (const layer of layers) layer.isOn = wanted.includes(layer.id);
+    followLayers(parts.get('layers'));
     const range = rangeIn(parts.get('range'));
-    if (range && parts.get('range') !== this.rangeInLink()) this.selection.select(range.from, range.to);
+    const { range: selected } = this.selection;
+    if (range && parts.get('range') !== (selected && rangeText(selected))) this.selection.select(range.from, range.to);
     this.controls.showState();
     this.requestFrame();
-  }
-
-  private rangeInLink(): string | undefined {
-    const { range } = this.selection;
-    return range && rangeText(range);
-  }
-
-  /// The address of what is shown, after "#".
-  private link(): string {
-    const on = layersOn();
-    const others = withParts(location.hash, [['range', this.rangeInLink()], ...partsOfAdjustment(this.adjustment)]);
-    return linkToView(others, {
-      time: this.player.time,
-      zoom: this.timeline.zoomed,
-      stream: this.entries.chosenStream,
-      filter: this.entries.filterText,
-      layers: on.join() === this.usualLayers.join() ? undefined : on,
-    });
   }
 
   private followLinkToEntries(): void {
@@ -382,12 +319,21 @@ export class App implements Page {
     this.linked = this.session;
   }
 
-  /// The address tells what is shown, but not sixty times a second: browsers allow few changes.
-  private writeLink = debounced(() => {
-    if (!this.session || this.linked !== this.session || this.player.playing) return;
-    const link = this.link();
-    if (link !== location.hash) history.replaceState(null, '', link);
-  }, 300);
+  private view(): WholeView {
+    return {
+      time: this.player.time,
+      zoom: this.timeline.zoomed,
+      stream: this.entries.chosenStream,
+      filter: this.entries.filterText,
+      range: this.selection.range,
+      adjustment: this.adjustment,
+    };
+  }
+
+  /// The address does not follow the movie while it plays.
+  private viewToLink(): WholeView | undefined {
+    return this.session && this.linked === this.session && !this.player.playing ? this.view() : undefined;
+  }
 
   // What is shown
 
@@ -395,9 +341,10 @@ export class App implements Page {
     const layer = layers.find((layer) => layer.id === id);
     if (!layer) return;
     layer.isOn = !layer.isOn;
+    if (id === 'heat' && !layer.isOn) this.selection.dropHeat();
     this.controls.showState();
     announce(`${layer.name} ${layer.isOn ? 'shown' : 'hidden'}`);
-    this.writeLink();
+    this.address.write();
     this.requestFrame();
   }
 
@@ -431,25 +378,35 @@ export class App implements Page {
     this.player.loop = loops ? range : undefined;
     this.timeline.showSelection(range);
     this.rangeBar.show();
+    this.followHeat();
     this.rangeChanged();
-    this.writeLink();
+    this.address.write();
   }
 
   /// The heat map tells of the selection, or of what the lanes show.
   private rangeChanged(): void {
     const { range, hasHeat } = this.selection;
     const { from, to } = hasHeat && range ? range : this.timeline.range;
-    const heat = layers.find(({ id }) => id === 'heat')!;
-    if (hasHeat && !heat.isOn) this.switchLayer('heat');
     this.stage.setHeatRange(from, to);
     this.requestFrame();
+  }
+
+  /// The layer is on while it tells of the selection, and afterwards as it was before.
+  private followHeat(): void {
+    const { hasHeat } = this.selection;
+    if (hasHeat === this.heat.isOfSelection) return;
+    const layer = layers.find(({ id }) => id === 'heat')!;
+    this.heat = { isOfSelection: hasHeat, wasOn: hasHeat ? layer.isOn : this.heat.wasOn };
+    const isWanted = hasHeat || (layer.isOn && this.heat.wasOn);
+    if (isWanted !== layer.isOn) this.switchLayer('heat');
   }
 
   /// The range is one of the movie.
   private insightsIn({ from, to }: Range): ReturnType<Decoder['insights']> {
     const { offset } = this.adjustment;
     const parameters = { start: from - offset, end: to - offset };
-    return this.decoder.insights({ name: 'activity', parameters }, { name: 'applications', parameters });
+    const activity = { ...parameters, least: shortestIdle };
+    return this.decoder.insights({ name: 'activity', parameters: activity }, { name: 'applications', parameters });
   }
 
   selectSome(): void {
@@ -472,10 +429,8 @@ export class App implements Page {
     zoomStage(this.stage.zoom, factor);
   }
 
-  /// The name of the movie's file.
   private fileName(): string {
-    const [name = ''] = this.movieName.split(/[\\/]/).slice(-1);
-    return this.movieUrl.startsWith('blob:') || !name ? name || this.session?.name || 'recording' : decodedName(name);
+    return this.movie.fileName(this.session?.name ?? 'recording');
   }
 
   saveStill(): void {
@@ -492,15 +447,15 @@ export class App implements Page {
       this.timeline.setDuration(player.duration);
       this.selection.setDuration(player.duration);
     }
-    this.stage.lay();
+    this.stage.fit();
     if (session && player.movie !== this.shownMovie) {
       this.shownMovie = player.movie;
       this.timeline.invalidate(); // the movie may show another part of the screen
       showCheck(session, player.size);
     }
     this.controls.showState();
-    this.tellOfMovie();
-    this.writeLink();
+    if (session) this.movie.tell(player.movie, session.region);
+    this.address.write();
     this.requestFrame();
   }
 
@@ -508,21 +463,6 @@ export class App implements Page {
   private pictureChanged(): void {
     this.stage.drawPicture();
     this.frame();
-  }
-
-  private tellOfMovie(): void {
-    const note = byId('stage-note');
-    const { movie } = this.player;
-    note.hidden = !this.session || movie === 'ready' || movie === 'loading';
-    const name = this.movieName || 'The movie';
-    const reason =
-      movie === 'none'
-        ? 'There is no movie with this recording.'
-        : this.movieUrl.startsWith('blob:')
-          ? `This browser can show no pictures of ${name}.`
-          : `${name} is not beside this page, or has no pictures that this browser can show.`;
-    const stand = this.session?.region ? 'The recorded region stands for it.' : assumption(undefined);
-    setText(note, shown(`${reason} ${stand}`));
   }
 
   complain(text: string): void {
@@ -577,53 +517,4 @@ export class App implements Page {
       this.complain(`The entries could not be saved: ${wordsOf(error)}.`);
     }
   }
-}
-
-function sessionOf(decoded: Decoded, { offset, region }: Adjustment): Session {
-  return new Session(shifted(decoded, offset), region);
-}
-
-/// A page writes names in addresses with percent signs.
-function decodedName(name: string): string {
-  try {
-    return decodeURIComponent(name);
-  } catch {
-    return name;
-  }
-}
-
-function stillProblem(error: unknown): string {
-  return error instanceof DOMException && error.name === 'SecurityError'
-    ? 'the browser does not let a page read a movie beside it. Choose the movie under Facts, Adjust, or drop it on the page, and save the picture then'
-    : wordsOf(error);
-}
-
-/// Without the name of the file in front, where the sentence has it already. A clause about the file gets its subject.
-function wordsOf(error: unknown, name = ''): string {
-  const words = (error instanceof Error ? error.message : String(error)).replace(/\.$/, '');
-  const clause = name && words.startsWith(`${name}: `) ? words.slice(name.length + 2) : words;
-  return /^(begins|is) /.test(clause) ? `it ${clause}` : clause;
-}
-
-function layersOn(): string[] {
-  return layers.filter(({ isOn }) => isOn).map(({ id }) => id);
-}
-
-const firstAtoms = /^(ftyp|mdat|moov|free|skip|wide|RIFF)$/;
-
-/// Of a file in which no reader finds a stream. One that was cut short has lost them, and says so.
-function whyNothing({ verify }: Decoded): string {
-  const finding = verify.findings?.find(({ severity }) => severity === 'damage');
-  if (finding?.offset === 0 && !firstAtoms.test(finding.place ?? ''))
-    return 'it begins neither like a movie, nor a RIFF file, nor a stream';
-  const nothing = 'it holds nothing that was recorded beside a movie';
-  return finding ? `${nothing}, and is damaged: ${finding.place} at offset ${finding.offset}, ${finding.message}` : nothing;
-}
-
-function debounced(action: () => void, delay: number): () => void {
-  let timer: ReturnType<typeof setTimeout> | undefined;
-  return () => {
-    clearTimeout(timer);
-    timer = setTimeout(action, delay);
-  };
 }

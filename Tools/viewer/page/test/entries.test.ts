@@ -1,9 +1,9 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
-import { asCSV, asJSON } from '../src/entries/copy';
+import { asCSV, asJSON, csvOf } from '../src/entries/copy';
 import { filterRows, testOf } from '../src/entries/filter';
 import { AllRows, StreamRows, type Rows } from '../src/entries/rows';
-import { orderOf, picked, placesOf } from '../src/entries/sorting';
+import { orderOf, picked, placesOf, rankedKeys } from '../src/entries/sorting';
 import { mergedOf } from '../src/model/merged';
 import { Track } from '../src/model/track';
 import { randomNumbers } from './synthetic';
@@ -79,16 +79,16 @@ test('what was typed is neither shown nor found nor copied before the reader ask
   assert.equal(rows.cell(0, 2), '•');
   assert.deepEqual(await found(rows, 'characterString=H'), []);
   assert.deepEqual(await found(rows, 'characterCode=72'), []);
-  assert.ok(!asJSON(rows, [0]).includes('72') && !asCSV(rows, [0]).includes('H'));
+  assert.ok(!(await asJSON(rows, [0])).includes('72') && !csvOf(rows, [0]).includes('H'));
   assert.ok(!new AllRows([keys], () => shows).cell(0, 2).includes('72'));
   shows = true;
   assert.equal(rows.cell(0, 2), 'H');
   assert.deepEqual(await found(rows, 'characterString=H'), [0]);
 });
 
-test('rows are copied as JSON and CSV', () => {
+test('rows are copied as JSON and CSV', async () => {
   const rows = new StreamRows(keys, () => true);
-  assert.deepEqual(JSON.parse(asJSON(rows, [1])), [
+  assert.deepEqual(JSON.parse(await asJSON(rows, [1])), [
     {
       characterCode: 73,
       characterString: 'I',
@@ -98,16 +98,29 @@ test('rows are copied as JSON and CSV', () => {
     },
   ]);
   assert.equal(
-    asCSV(rows, [1]),
+    csvOf(rows, [1]),
     'characterCode,characterString,eventFlagsCode,eventFlagsString,timestamp\n73,I,0,"<Shift>, ""so""",2.5\n',
   );
 });
 
-test('copies of several streams have the columns of all', () => {
+test('copies of several streams have the columns of all', async () => {
   const rows = new AllRows([keys, points], () => true);
-  const lines = asCSV(rows, [0, 1]).split('\n');
+  const lines = csvOf(rows, [0, 1]).split('\n');
   assert.equal(lines[0], 'kind,x,y,timestamp,characterCode,characterString,eventFlagsCode,eventFlagsString');
   assert.equal(lines[1], 'cursorLocation,100,5,1,,,,');
+  assert.equal(await asCSV(rows, [0, 1]), csvOf(rows, [0, 1]), 'in pieces as at once');
+});
+
+test('a phrase is found in one value, and across two fields', async () => {
+  const titles = new Track({
+    kind: 'topmostWindowTitle',
+    time: Float64Array.of(1, 2, 3),
+    columns: { title: ['Two words here', 'Two', 'words'], other: ['', 'x', ''] },
+  });
+  const rows = new AllRows([titles], () => true);
+  assert.deepEqual(await found(rows, '"two words"'), [0]);
+  assert.deepEqual(await found(rows, '"two  oth"'), [1]);
+  assert.deepEqual(await found(rows, '"words two"'), []);
 });
 
 test('a word is found in what is shown, however it is looked for', async () => {
@@ -158,4 +171,10 @@ test('all streams by time are merged as one by one', () => {
   all.sort((a, b) => a.time - b.time || a.k - b.k);
   assert.deepEqual([...stream], all.map(({ k }) => k));
   assert.deepEqual([...row], all.map(({ row }) => row));
+});
+
+test('texts have the numbers of their order, and nothing comes last', () => {
+  const values = ['b10', 'b9', null, 'A'];
+  assert.deepEqual([...rankedKeys(values, Uint32Array.of(0, 1, 2, 3, 0))].map((key, row) => [row, key]).filter(([, key]) => !Number.isNaN(key)).sort((a, b) => a[1]! - b[1]!).map(([row]) => row), [3, 1, 0, 4]);
+  assert.ok(Number.isNaN(rankedKeys(values, Uint32Array.of(2))[0]));
 });

@@ -51,3 +51,21 @@ test('a file without notes is refused, and no note comes twice', () => {
     assert.throws(() => notesIn(text), text);
   assert.deepEqual(joined(notes.slice(1), notes), notes);
 });
+
+test('a file of notes has bounds, and its times are numbers', () => {
+  const file = (notes: unknown[]) => JSON.stringify({ schema: 'zulm.notes', schema_version: 1, notes });
+  const many = Array.from({ length: 10_001 }, (_, i) => ({ time: i, text: 'note' }));
+  assert.throws(() => notesIn(file(many)), /10001 notes.*10000 at most/);
+  for (const time of ['', [], true, null]) assert.throws(() => notesIn(file([{ time, text: 'note' }])), /holds no notes/);
+  const note = { time: 1, text: 'twice' };
+  assert.deepEqual(joined([], [note, { ...note }]), [note]);
+});
+
+test('notes keep their times below zero, and their lines', () => {
+  const early = [{ time: -7.5, text: 'one\u2028two' }, { time: 0.0000001, text: 'late' }];
+  assert.deepEqual(notesIn(notesText(early, 'A.mp4', 'md')), [early[0], { time: 0, text: 'late' }]);
+  assert.equal(notesText(early, 'A.mp4', 'csv'), 'time,text\n-7.5,one\u2028two\n0,late\n');
+  assert.deepEqual(notesIn('time,text\r-7.5,one\r'), [{ time: -7.5, text: 'one' }]);
+  const [exact] = notesIn(notesText([{ time: 1.2344, text: 'note' }], 'A.mp4', 'md'));
+  assert.equal(joined([{ time: 1.2344, text: 'note' }], [exact!]).length, 1, 'Markdown has fewer digits');
+});

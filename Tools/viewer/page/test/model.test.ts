@@ -1,6 +1,7 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
 import type { Column, Entries, Table } from '#decoder';
+import { lanesOf } from '../src/lanes/lanes';
 import { appearancesIn } from '../src/model/appearances';
 import { clickLabel, clicksAround, clicksIn } from '../src/model/clicks';
 import { bytes, clock, plural, spokenTime, titleOf } from '../src/model/format';
@@ -10,7 +11,7 @@ import { placementOf } from '../src/model/geometry';
 import { linkTo, timeInLink } from '../src/model/link';
 import { markerAfter, markerBefore } from '../src/model/markers';
 import { countBefore, countUntil, lastAt } from '../src/model/search';
-import { believableEnd, Session, type Decoded } from '../src/model/session';
+import { Session, type Decoded } from '../src/model/session';
 import { Track } from '../src/model/track';
 
 export function entries(kind: string, time: number[], columns: Record<string, Column> = {}): Entries {
@@ -22,6 +23,7 @@ function session(list: Entries[], tables: Partial<Decoded> = {}): Session {
     name: 'Test.mp4',
     container: 'movie',
     duration: 20,
+    length: 8,
     streams: [],
     entries: list,
     keys: undefined,
@@ -138,6 +140,15 @@ test('idle times are what the library tells', () => {
   ]);
   assert.equal(idleTime(stretches), 15.5);
   assert.deepEqual(idleIn(undefined, 20), []);
+  const early = { kind: 'idle', time: Float64Array.of(-10), columns: { end: Float64Array.of(4) } };
+  assert.deepEqual(idleIn(early, 20), [{ start: 0, end: 4 }], 'an offset moved it before the movie');
+});
+
+test('hidden characters of a note show themselves in its lane', () => {
+  const notes = () => [{ time: 1, text: 'invoice\u202efdp.exe' }];
+  const region = () => ({ x: 0, y: 0, width: 10, height: 10 });
+  const lane = lanesOf(session([]), { showsKeys: () => false, region, notes }).find(({ title }) => title === 'Notes');
+  assert.equal(lane?.valueAt(1.2), 'invoice[U+202E]fdp.exe');
 });
 
 test('the last region with an area is the recorded one, and the movie says how long it is', () => {
@@ -154,23 +165,18 @@ test('the last region with an area is the recorded one, and the movie says how l
   assert.equal(recording.duration, 20);
 });
 
-test('without a movie the last entry ends the recording, unless its time cannot be believed', () => {
-  const end = (...times: number[]) => believableEnd([Float64Array.of(0, 1, 8), Float64Array.from(times)]);
-  assert.equal(end(), 8);
-  assert.equal(end(25.5), 25.5);
-  assert.equal(end(1e9), 8);
-  assert.equal(end(9, 1e9, 2e9), 9);
-  assert.equal(end(30000, 50000, 90000, 100000), 100000);
-  assert.equal(believableEnd([Float64Array.of(1e9)]), 1e9);
-  assert.equal(believableEnd([]), 0);
+test('a movie without a duration lasts as long as the library says', () => {
+  assert.equal(session([], { duration: 20 }).duration, 20);
+  assert.equal(session([], { duration: undefined }).duration, 8);
+  assert.equal(session([], { duration: undefined }).movieDuration, undefined);
 });
 
-test('the place where the cursor stayed longest is the warmest', () => {
+test('the place where the cursor stayed longest is the warmest', async () => {
   const track = new Track(
     entries('cursorLocation', [0, 1, 4], { x: Int32Array.of(320, 960, 100), y: Int32Array.of(270, 810, 100) }),
   );
   const placement = placementOf({ x: 0, y: 0, width: 1280, height: 1080 }, 1, undefined);
-  const heat = heatOf(track, placement, 0, 4);
+  const heat = await heatOf(track, placement, 0, 4);
   const at = (x: number, y: number) => heat[Math.floor(y * heatHeight) * heatWidth + Math.floor(x * heatWidth)]!;
   assert.equal(at(0.75, 0.75), 1);
   assert.ok(at(0.25, 0.25) > 0.4 && at(0.25, 0.25) < 0.7);

@@ -1,6 +1,8 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
-import { adjustmentIn, asRecorded, partsOfAdjustment, shiftedTable } from '../src/adjust/adjustment';
+import { prepare } from '../src/model/prepared';
+import type { Decoded } from '../src/model/session';
+import { adjustmentIn, asRecorded, partsOfAdjustment, shifted, shiftedTable } from '../src/adjust/adjustment';
 import { decimal } from '../src/model/decimals';
 import { joined } from '../src/model/joining';
 import { rangeIn, rangeText, withParts } from '../src/model/link';
@@ -40,6 +42,20 @@ test('in and out points move one edge, or make a range with an end of the record
   assert.equal(selection.range, undefined);
 });
 
+test('a selection ends where the movie ends, also after the movie became shorter', () => {
+  const selection = new Selection();
+  let told = 0;
+  selection.onChange = () => ++told;
+  selection.start(20);
+  selection.select(5, 20);
+  selection.setDuration(18);
+  assert.deepEqual([selection.range, told], [{ from: 5, to: 18 }, 2]);
+  selection.setDuration(18);
+  assert.equal(told, 2);
+  selection.setDuration(4);
+  assert.equal(selection.range, undefined);
+});
+
 test('extending keeps the edge where the selection began', () => {
   const selection = new Selection();
   selection.start(10);
@@ -62,7 +78,21 @@ test('an adjustment is read from a link as it was written', () => {
   const adjustment = { offset: -12.5, region: { x: -1920, y: 0, width: 1280, height: 720 } };
   assert.equal(withParts('#t=1', partsOfAdjustment(adjustment)), '#t=1&offset=-12.5&region=-1920,0,1280,720');
   assert.deepEqual(adjustmentIn('#t=1&offset=-12.5&region=-1920,0,1280,720'), adjustment);
-  for (const hash of ['', '#offset=x', '#region=1,2,3', '#region=0,0,0,5']) assert.deepEqual(adjustmentIn(hash), asRecorded);
+  for (const hash of ['', '#offset=x', `#offset=${'9'.repeat(400)}`, `#region=0,0,${'9'.repeat(400)},5`, '#region=1,2,3', '#region=0,0,0,5']) assert.deepEqual(adjustmentIn(hash), asRecorded);
+  assert.deepEqual(adjustmentIn('#region=1,2,3,4', adjustment), { offset: -12.5, region: { x: 1, y: 2, width: 3, height: 4 } });
+  assert.deepEqual(adjustmentIn('#offset=2', adjustment), { ...adjustment, offset: 2 });
+});
+
+test('an offset moves every time, and those of streams without order', async () => {
+  const time = Float64Array.of(5, 1);
+  const stream = { kind: 'cursorAction', time, columns: {} };
+  const prepared = prepare([stream]);
+  const decoded = { length: 8, streams: [], entries: [stream], hidden: [], prepared } as unknown as Decoded;
+  const moved = await shifted(decoded, 2);
+  assert.equal(moved.length, 10);
+  assert.deepEqual([...moved.entries[0]!.time], [7, 3]);
+  assert.deepEqual([...moved.prepared!.order.cursorAction!.times], [3, 7]);
+  assert.deepEqual([...time], [5, 1]);
 });
 
 test('an offset moves all times of a table and nothing else', () => {

@@ -6,6 +6,7 @@ import { hasArea, type Rect } from '../model/geometry';
 import { partsOf } from '../model/link';
 import type { Prepared } from '../model/prepared';
 import type { Decoded } from '../model/session';
+import { breath } from '../ui/breath';
 
 export interface Adjustment {
   /// Seconds that are added to every time of the recording.
@@ -23,10 +24,12 @@ export function regionOf(numbers: number[] | undefined): Rect | undefined {
   return hasArea(rect) ? rect : undefined;
 }
 
-export function adjustmentIn(hash: string): Adjustment {
+/// What a link lacks is as in `otherwise`.
+export function adjustmentIn(hash: string, otherwise = asRecorded): Adjustment {
   const parts = partsOf(hash);
-  const [offset] = decimalsOf([parts.get('offset') ?? '0']) ?? [0];
-  return { offset: offset!, region: regionOf(decimalsOf(parts.get('region')?.split(',') ?? [])) };
+  const [offset] = parts.has('offset') ? (decimalsOf([parts.get('offset')!]) ?? [0]) : [otherwise.offset];
+  const numbers = parts.get('region')?.split(',');
+  return { offset: offset!, region: numbers ? regionOf(decimalsOf(numbers)) : otherwise.region };
 }
 
 /// For a link.
@@ -45,14 +48,19 @@ export function isSame(one: Adjustment, other: Adjustment): boolean {
 /// Columns of insights that hold times.
 const timeColumns = ['end', 'zoom_start', 'zoom_end'];
 
+function moved(times: Float64Array, offset: number): Float64Array {
+  const result = new Float64Array(times.length);
+  for (let i = 0; i < times.length; ++i) result[i] = times[i]! + offset;
+  return result;
+}
+
 export function shiftedTable<Kind extends Table>(table: Kind, offset: number): Kind {
   if (offset === 0) return table;
-  const shift = (times: Float64Array) => times.map((time) => time + offset);
   const columns = Object.entries(table.columns).map(([name, column]) => [
     name,
-    column instanceof Float64Array && timeColumns.includes(name) ? shift(column) : column,
+    column instanceof Float64Array && timeColumns.includes(name) ? moved(column, offset) : column,
   ]);
-  return { ...table, time: shift(table.time), columns: Object.fromEntries(columns) };
+  return { ...table, time: moved(table.time, offset), columns: Object.fromEntries(columns) };
 }
 
 function shiftedSummary(stream: StreamSummary, offset: number): StreamSummary {
@@ -63,26 +71,38 @@ function shiftedSummary(stream: StreamSummary, offset: number): StreamSummary {
 
 function shiftedParts(prepared: Prepared, offset: number): Prepared {
   const { times, values } = prepared.speed;
-  return { ...prepared, speed: { times: times.map((time) => time + offset), values } };
+  const order = Object.entries(prepared.order).map(([kind, sorted]) => [
+    kind,
+    sorted && { ...sorted, times: moved(sorted.times, offset) },
+  ]);
+  return { ...prepared, speed: { times: moved(times, offset), values }, order: Object.fromEntries(order) };
 }
 
-/// Everything at the times of the movie.
-export function shifted(decoded: Decoded, offset: number): Decoded {
+/// Returns everything at the times of the movie. The page goes on meanwhile.
+export async function shifted(decoded: Decoded, offset: number): Promise<Decoded> {
   if (offset === 0) return decoded;
-  const moved = <Kind extends Table>(table: Kind | undefined) => table && shiftedTable(table, offset);
+  const move = async <Kind extends Table>(table: Kind): Promise<Kind> => {
+    await breath();
+    return shiftedTable(table, offset);
+  };
+  const moveIf = async <Kind extends Table>(table: Kind | undefined) => table && move(table);
   const { keys, prepared } = decoded;
+  const entries = [];
+  for (const table of decoded.entries) entries.push(await move(table));
+  const hidden = [];
+  for (const { stream, entries } of decoded.hidden)
+    hidden.push({ stream: shiftedSummary(stream, offset), entries: await moveIf(entries) });
+  await breath();
   return {
     ...decoded,
+    length: decoded.length + offset,
     streams: decoded.streams.map((stream) => shiftedSummary(stream, offset)),
-    entries: decoded.entries.map((entries) => shiftedTable(entries, offset)),
-    keys: keys && { clear: shiftedTable(keys.clear, offset), masked: shiftedTable(keys.masked, offset) },
-    clicks: moved(decoded.clicks),
-    idle: moved(decoded.idle),
-    appearances: moved(decoded.appearances),
+    entries,
+    keys: keys && { clear: await move(keys.clear), masked: await move(keys.masked) },
+    clicks: await moveIf(decoded.clicks),
+    idle: await moveIf(decoded.idle),
+    appearances: await moveIf(decoded.appearances),
     prepared: prepared && shiftedParts(prepared, offset),
-    hidden: decoded.hidden.map(({ stream, entries }) => ({
-      stream: shiftedSummary(stream, offset),
-      entries: moved(entries),
-    })),
+    hidden,
   };
 }

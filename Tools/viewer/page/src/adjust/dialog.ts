@@ -6,8 +6,8 @@ import { byId, make } from '../ui/dom';
 import { asRecorded, regionOf, type Adjustment } from './adjustment';
 
 export interface AdjustEvents {
-  onAdjust: (adjustment: Adjustment) => void;
-  onMovie: (movie: File) => void;
+  /// The movie is undefined if it stays, and null if it is to be that of the recording.
+  onAdjust: (adjustment: Adjustment, movie?: File | null) => void;
 }
 
 const regionNames = ['Left', 'Top', 'Width', 'Height'];
@@ -30,20 +30,18 @@ export function showAdjusting({ offset, region }: Adjustment, events: AdjustEven
     make(
       'div',
       { class: 'dialog-actions' },
-      action('As recorded', '', () => finish(asRecorded)),
+      action('As recorded', '', () => finish(asRecorded, null)),
       make('button', { class: 'button is-primary', type: 'submit' }, 'Apply'),
     ),
   );
-  const finish = (adjustment: Adjustment) => {
+  const finish = (adjustment: Adjustment, movie?: File | null) => {
     dialog.close();
-    events.onAdjust(adjustment);
-    const file = movie.files?.[0];
-    if (file) events.onMovie(file);
+    events.onAdjust(adjustment, movie);
   };
   form.addEventListener('submit', (event) => {
     event.preventDefault();
     const written = readFields(offsetField, regionFields);
-    if (written) finish(written);
+    if (written) finish(written, movie.files?.[0]);
   });
   form.addEventListener('input', () => [offsetField, ...regionFields].forEach((input) => input.setCustomValidity('')));
   fillDialog(dialog, 'adjust-title', 'How the recording belongs to the movie', form);

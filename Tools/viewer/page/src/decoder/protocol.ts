@@ -17,11 +17,15 @@ export type Request =
   /// A file, or the size of the one that the pieces hold.
   | { id: number; type: 'open'; source: Blob | number; name: string; reports: boolean }
   | { id: number; type: 'keep'; opened: number }
+  /// It will not be shown.
+  | { id: number; type: 'forget'; opened: number }
   | { id: number; type: 'dump'; opened: number }
   | { id: number; type: 'insights'; opened: number; asked: Insight[] };
 
 export type Reply =
   | { id: number; type: 'opened'; decoded: Decoded; problems: string[] }
+  /// How much of the work of opening is done, from 0 to 1. More replies follow.
+  | { id: number; type: 'progress'; part: number }
   | { id: number; type: 'kept' }
   | { id: number; type: 'dumped'; text: string }
   | { id: number; type: 'computed'; tables: Table[] }

@@ -2,6 +2,7 @@
 
 import type { Table } from '#decoder';
 import type { Decoded } from '../model/session';
+import { breath } from '../ui/breath';
 
 type Columns = Table['columns'];
 type Listed = Extract<Columns[string], unknown[]>;
@@ -57,8 +58,16 @@ export function wrapped(decoded: Decoded): Decoded {
   return changed(decoded, codedColumn);
 }
 
-export function unwrapped(decoded: Decoded): Decoded {
-  return changed(decoded, spreadColumn);
+/// The page goes on meanwhile.
+export async function unwrapped(decoded: Decoded): Promise<Decoded> {
+  const known = new Map<unknown, Columns[string]>();
+  const listed: unknown[] = [];
+  changed(decoded, (column) => (ArrayBuffer.isView(column) || listed.push(column), column));
+  for (const column of listed) {
+    known.set(column, spreadColumn(column) as Columns[string]);
+    await breath();
+  }
+  return changed(decoded, (column) => known.get(column) ?? column);
 }
 
 /// All memory that can be handed over instead of copied. Images may share theirs with others, and are copied.

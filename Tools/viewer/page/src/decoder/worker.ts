@@ -21,7 +21,15 @@ function wordsOf(error: unknown): string {
   return `the decoder stopped (${error instanceof Error ? error.message : String(error)})`;
 }
 
-function decode(opened: Recording, name: string, reports: boolean): { decoded: Decoded; problems: string[] } {
+const decodingPart = 0.7; // of the time of opening: the library works
+
+/// Calls `tell` with the part of its work that is done.
+function decode(
+  opened: Recording,
+  name: string,
+  reports: boolean,
+  tell: (part: number) => void,
+): { decoded: Decoded; problems: string[] } {
   const problems: string[] = [];
   const attempt = <Result>(what: string, action: () => Result): Result | undefined => {
     try {
@@ -35,12 +43,14 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
   for (const { kind, known } of opened.streams) {
     const read = known ? attempt(kind, () => opened.entries(kind)) : undefined;
     if (read) entries.push(read);
+    tell((entries.length / opened.streams.length) * 0.8);
   }
   const keys = attempt('captions', () => ({
     clear: opened.insights('captions', { shows_keys: true }),
     masked: opened.insights('captions', { shows_keys: false }),
   }));
   const clicks = attempt('clicks', () => opened.insights('clicks'));
+  const last = () => Number(opened.insights('activity').columns.end?.[0] ?? 0);
   const idle = attempt('idle times', () => opened.insights('idle', { least: shortestIdle }));
   const cursors = entries.find(({ kind }) => kind === 'cursorImage');
   const appearances = cursors && attempt('cursors', () => opened.at(new Track(cursors).times));
@@ -52,6 +62,7 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
     name,
     container: opened.container,
     duration: opened.duration,
+    length: opened.duration || attempt('length', last) || 0,
     streams: opened.streams.map((stream) => ({ ...stream })),
     entries,
     keys: keys && keys.clear.time.length > 0 ? keys : undefined,
@@ -66,16 +77,22 @@ function decode(opened: Recording, name: string, reports: boolean): { decoded: D
 }
 
 /// What was asked something after it was opened. It stays open, since more questions follow.
-let asked: { id: number; recording: Recording } | undefined;
+let asked: { id: number; recording: Promise<Recording> } | undefined;
 
 function closeAsked(): void {
-  asked?.recording.close();
+  asked?.recording.then((recording) => recording.close()).catch(() => {}); // who asked is told
   asked = undefined;
 }
 
+/// What is opened after it is not shown yet.
 function keep(id: number): void {
-  for (const other of recordings.keys()) if (other !== id) recordings.delete(other);
+  for (const other of recordings.keys()) if (other < id) recordings.delete(other);
   if (asked?.id !== id) closeAsked();
+}
+
+function forget(id: number): void {
+  recordings.delete(id);
+  if (asked?.id === id) closeAsked();
 }
 
 function reopening(source: Blob | number, name: string): Reopen {
@@ -91,34 +108,39 @@ function opened(id: number): Promise<Recording> {
   return reopen();
 }
 
-/// Asks what was opened under this number. What has failed is opened anew for the next question.
+/// Asks what was opened under this number: all questions ask the same one. What has failed is opened anew for the next.
 async function using<Result>(id: number, use: (recording: Recording) => Result): Promise<Result> {
   if (asked?.id !== id) {
-    const recording = await opened(id);
+    const recording = opened(id);
     closeAsked();
     asked = { id, recording };
   }
+  const mine = asked;
   try {
-    return use(asked.recording);
+    return use(await mine.recording);
   } catch (error) {
-    closeAsked();
+    if (asked === mine) closeAsked();
     throw error;
   }
 }
 
 /// Closes it before the rest is worked out, which takes memory too.
 async function open(id: number, name: string, reports: boolean): Promise<{ decoded: Decoded; problems: string[] }> {
+  const tell = (part: number) => self.postMessage({ id, type: 'progress', part } satisfies Reply);
   const recording = await opened(id);
-  const { decoded, problems } = decode(recording, name, reports);
+  tell(0.1);
+  const { decoded, problems } = decode(recording, name, reports, (part) => tell(0.1 + part * decodingPart));
   recording.close();
-  decoded.prepared = prepare(decoded.entries.map((entries) => new Track(entries)));
+  tell(0.1 + decodingPart);
+  decoded.prepared = prepare(decoded.entries);
   return { decoded: wrapped(decoded), problems };
 }
 
 async function answer(request: Exclude<Request, { type: 'piece' }>): Promise<[Reply, ArrayBuffer[]]> {
   const { id } = request;
-  if (request.type === 'keep') {
-    keep(request.opened);
+  if (request.type === 'keep' || request.type === 'forget') {
+    if (request.type === 'keep') keep(request.opened);
+    else forget(request.opened);
     return [{ id, type: 'kept' }, []];
   }
   if (request.type === 'dump')
@@ -130,8 +152,13 @@ async function answer(request: Exclude<Request, { type: 'piece' }>): Promise<[Re
   }
   const { source, name, reports } = request;
   recordings.set(id, reopening(source, name));
-  const result = await open(id, name, reports);
-  return [{ id, type: 'opened', ...result }, [...buffersIn(result.decoded)]];
+  try {
+    const result = await open(id, name, reports);
+    return [{ id, type: 'opened', ...result }, [...buffersIn(result.decoded)]];
+  } catch (error) {
+    forget(id);
+    throw error;
+  }
 }
 
 self.onmessage = async ({ data }: MessageEvent<Request>) => {

@@ -1,12 +1,9 @@
 // Rows as texts for other programs.
 
+import { breath } from '../ui/breath';
 import type { CellValue, Rows } from './rows';
 
-export function asJSON(rows: Rows, chosen: Iterable<number>): string {
-  const lines: string[] = [];
-  for (const row of chosen) lines.push(JSON.stringify(rows.fields(row)));
-  return `[${lines.join(',\n ')}]\n`;
-}
+type Fields = Record<string, CellValue>;
 
 function field(value: CellValue | undefined): string {
   if (value === null || value === undefined) return '';
@@ -14,12 +11,41 @@ function field(value: CellValue | undefined): string {
   return /[",\r\n]/.test(text) ? `"${text.replaceAll('"', '""')}"` : text;
 }
 
-export function asCSV(rows: Rows, chosen: Iterable<number>): string {
-  const all = [...chosen].map((row) => rows.fields(row));
+const lineOf = (values: (CellValue | undefined)[]) => values.map((value) => field(value)).join(',') + '\n';
+
+export function csvOf(rows: Rows, chosen: number[]): string {
+  const all = chosen.map((row) => rows.fields(row));
   const names = [...new Set(all.flatMap((fields) => Object.keys(fields)))];
-  return [names, ...all.map((fields) => names.map((name) => fields[name]))]
-    .map((values) => values.map((value) => field(value)).join(',') + '\n')
-    .join('');
+  return [lineOf(names), ...all.map((fields) => lineOf(names.map((name) => fields[name])))].join('');
+}
+
+const piece = 1000; // rows at a time
+
+/// Lets the page go on after each piece.
+async function inPieces<Item, Result>(items: Item[], take: (item: Item) => Result): Promise<Result[]> {
+  const results: Result[] = [];
+  for (let i = 0; i < items.length; i += piece) {
+    for (const item of items.slice(i, i + piece)) results.push(take(item));
+    await breath();
+  }
+  return results;
+}
+
+export async function asJSON(rows: Rows, chosen: number[]): Promise<string> {
+  const lines = await inPieces(chosen, (row) => JSON.stringify(rows.fields(row)));
+  return `[${lines.join(',\n ')}]\n`;
+}
+
+/// Like `csvOf`, for many rows.
+export async function asCSV(rows: Rows, chosen: number[]): Promise<string> {
+  const names = new Set<string>();
+  const all = await inPieces(chosen, (row): Fields => {
+    const fields = rows.fields(row);
+    for (const name of Object.keys(fields)) names.add(name);
+    return fields;
+  });
+  const lines = await inPieces(all, (fields) => lineOf([...names].map((name) => fields[name])));
+  return [lineOf([...names]), ...lines].join('');
 }
 
 /// Clipboards end a text at its first NUL.

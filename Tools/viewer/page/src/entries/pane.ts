@@ -5,7 +5,8 @@ import { partition } from '../model/search';
 import type { HiddenStream, Session } from '../model/session';
 import { announce, byId, make, setText } from '../ui/dom';
 import { setIcon } from '../ui/icons';
-import { asCSV, asJSON, copyable, copyText } from './copy';
+import { wordsOf } from '../ui/words';
+import { asCSV, asJSON, copyable, copyText, csvOf } from './copy';
 import { filterRows, testOf } from './filter';
 import { AllRows, StreamRows, type Rows } from './rows';
 import { Sorter, type SortOrder } from './sorter';
@@ -21,6 +22,7 @@ export interface EntriesEvents {
 }
 
 const mostCopied = 500_000;
+const mostAtOnce = 5_000; // entries that are copied without letting the page go on
 const hiddenPrefix = 'hidden:'; // no kind's name has a colon
 
 export class EntriesPane {
@@ -113,6 +115,14 @@ export class EntriesPane {
     this.choose('');
   }
 
+  /// Shows the same recording at other times, with the stream, the filter and the order that the reader chose.
+  showAgain(session: Session): void {
+    const { order, chosenStream, filterText } = this;
+    this.show(session);
+    this.look(chosenStream, filterText);
+    if (order) void this.sortBy(order);
+  }
+
   /// Empty for all streams.
   get chosenStream(): string {
     return this.stream.value;
@@ -124,6 +134,7 @@ export class EntriesPane {
 
   /// Shows the entries of a stream that fit a filter, each only if it is given. A stream that is not there is none.
   look(stream: string | undefined, filter: string | undefined): void {
+    if ((stream ?? this.chosenStream) === this.chosenStream && (filter ?? this.filterText) === this.filterText) return;
     if (filter !== undefined) this.query.value = filter;
     const isThere = [...this.stream.options].some(({ value }) => value === stream);
     if (stream !== undefined && isThere) this.stream.value = stream;
@@ -209,16 +220,20 @@ export class EntriesPane {
   }
 
   /// First upwards, then downwards, then as they come.
-  private async sort(column: number): Promise<void> {
-    const { rows, order } = this;
-    if (!rows) return;
+  private sort(column: number): Promise<void> {
+    const { order } = this;
     const isNext = order?.column === column;
-    const wanted = isNext && order.isDescending ? undefined : { column, isDescending: isNext };
+    return this.sortBy(isNext && order.isDescending ? undefined : { column, isDescending: isNext });
+  }
+
+  private async sortBy(wanted: SortOrder | undefined): Promise<void> {
+    const { rows } = this;
+    if (!rows) return;
     [this.order, this.isSorting] = [wanted, wanted !== undefined];
     this.table.showOrder(wanted);
     this.showStatus();
     if (!wanted) return this.table.choose(this.matches);
-    await this.sorter.sort(rows, wanted);
+    await this.sorter.sort(rows, wanted, () => wanted !== this.order);
     if (wanted !== this.order) return;
     this.isSorting = false;
     if (this.isDone) await this.showSorted();
@@ -243,17 +258,18 @@ export class EntriesPane {
     setText(this.status, `${found}${isDone ? '' : ' …'}${selected}`);
   }
 
-  /// To the next match, or entry, behind or before the playhead.
+  /// Goes to the next match, or entry, after or before the playhead.
   step(direction: 1 | -1): void {
     const { rows, matches, session } = this;
     if (!rows || !session) return;
     const length = matches?.length ?? rows.count;
     const timeOf = (place: number) => rows.time(matches ? matches[place]! : place);
     const near = 0.0005;
-    const place =
-      direction > 0
+    const place = rows.isByTime
+      ? direction > 0
         ? partition(length, (i) => timeOf(i) <= this.time + near)
-        : partition(length, (i) => timeOf(i) < this.time - near) - 1;
+        : partition(length, (i) => timeOf(i) < this.time - near) - 1
+      : nearest(length, timeOf, this.time + direction * near, direction);
     if (place < 0 || place >= length) return announce(direction > 0 ? 'No further match' : 'No match before');
     const row = matches ? matches[place]! : place;
     this.go(row);
@@ -265,28 +281,40 @@ export class EntriesPane {
     if (Number.isFinite(time)) this.events.onSeek(time);
   }
 
-  /// By the keys of the system, where the browser asks what to copy.
+  /// By the keys of the system, where the browser asks what to copy. It does not wait for many.
   private copyHere(event: ClipboardEvent): void {
-    if (!this.rows || !event.clipboardData || this.table.selectedCount > mostCopied) return;
+    if (!this.rows || !event.clipboardData) return;
+    if (this.table.selectedCount > mostAtOnce) {
+      event.preventDefault();
+      return void this.copy('CSV', asCSV);
+    }
     const rows = [...this.table.wantedHere()];
     if (rows.length === 0) return;
-    event.clipboardData.setData('text/plain', copyable(asCSV(this.rows, rows)));
+    event.clipboardData.setData('text/plain', copyable(csvOf(this.rows, rows)));
     event.preventDefault();
     setText(this.status, `${plural(rows.length, 'entry', 'entries')} copied as CSV`);
   }
 
-  private async copy(name: string, write: (rows: Rows, chosen: Iterable<number>) => string): Promise<void> {
+  private async copy(name: string, write: (rows: Rows, chosen: number[]) => Promise<string>): Promise<void> {
     if (!this.rows) return;
-    const wanted = [...this.table.wanted()];
-    if (wanted.length > mostCopied)
-      return this.events.onProblem(
-        `${plural(wanted.length, 'entry', 'entries')} are too many to copy: filter them first, or save them as a file.`,
-      );
+    const entries = plural(this.table.wantedCount, 'entry', 'entries');
+    if (this.table.wantedCount > mostCopied)
+      return this.events.onProblem(`${entries} are too many to copy: filter them first, or save them as a file.`);
     try {
-      await copyText(write(this.rows, wanted));
-      setText(this.status, `${plural(wanted.length, 'entry', 'entries')} copied as ${name}`);
+      await copyText(await write(this.rows, [...this.table.wanted()]));
+      setText(this.status, `${entries} copied as ${name}`);
     } catch (error) {
-      this.events.onProblem(`The entries could not be copied: ${error instanceof Error ? error.message : error}.`);
+      this.events.onProblem(`The entries could not be copied: ${wordsOf(error)}.`);
     }
   }
+}
+
+/// The place whose time is the next one after or before `time`, or -1. The times may have any order.
+function nearest(length: number, timeOf: (place: number) => number, time: number, direction: 1 | -1): number {
+  let best = -1;
+  for (let place = 0; place < length; ++place) {
+    const distance = (timeOf(place) - time) * direction;
+    if (distance > 0 && (best < 0 || distance < (timeOf(best) - time) * direction)) best = place;
+  }
+  return best;
 }

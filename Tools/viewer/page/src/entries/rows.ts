@@ -27,6 +27,8 @@ export interface Rows {
   value(row: number, name: string): CellValue | undefined;
   /// What is copied of an entry.
   fields(row: number): Record<string, CellValue>;
+  /// Whether the rows are in the order of their times.
+  readonly isByTime: boolean;
   /// The last row that had happened at a time, or -1.
   rowAt(time: number): number;
   /// Whether a cell of a row holds a word in small letters.
@@ -102,6 +104,10 @@ export class StreamRows implements Rows {
     return fields;
   }
 
+  get isByTime(): boolean {
+    return this.track.isByTime;
+  }
+
   rowAt(time: number): number {
     const index = this.track.at(time);
     return index < 0 ? -1 : this.track.row(index);
@@ -114,9 +120,15 @@ export class StreamRows implements Rows {
 
   /// Like `wordTest`, for `summary`.
   summaryTest(word: string): RowTest {
-    if (/[=\s]/.test(word)) return (row) => this.summary(row).toLowerCase().includes(word);
+    if (this.spansFields(word)) return (row) => this.summary(row).toLowerCase().includes(word);
     if (this.names.some((name) => name.toLowerCase().includes(word))) return () => true;
     return anyOf(this.names.map((name) => this.columnTest(name, word, String)));
+  }
+
+  /// Whether a part of `summary` can be the word that belongs to no single value.
+  private spansFields(word: string): boolean {
+    const ends = [...word.matchAll(/\s/g)].map(({ index }) => word.slice(index + 1));
+    return word.includes('=') || ends.some((end) => this.names.some((name) => ` ${name}`.toLowerCase().startsWith(end)));
   }
 
   timeTest(word: string): RowTest {
@@ -232,6 +244,7 @@ export class AllRows implements Rows {
   }
 
   readonly pictureColumn = 2;
+  readonly isByTime = true;
 
   appearance(row: number): Appearance | undefined {
     return this.streams[this.stream[row]!]!.appearance(this.row[row]!);

@@ -12,33 +12,28 @@ export interface SortOrder {
 
 const piece = 50_000; // rows at a time
 
-const collator = new Intl.Collator('en', { numeric: true, sensitivity: 'base' });
+type Unsorted = { keys: Float64Array } | { values: unknown[]; places: Uint32Array };
 
-function compared(a: unknown, b: unknown): number {
-  if (typeof a === 'bigint' && typeof b === 'bigint') return a < b ? -1 : a > b ? 1 : 0;
-  return collator.compare(String(a), String(b));
-}
-
-/// What is no number is known by its place among all that there are.
-function ranksOf(values: Set<unknown>): Map<unknown, number> {
-  return new Map([...values].sort(compared).map((value, rank) => [value, rank]));
-}
-
-async function keysOf(rows: Rows, column: number): Promise<Float64Array> {
+/// Returns a number for each row, or the distinct values and which of them each row has.
+async function keysOf(rows: Rows, column: number): Promise<Unsorted> {
   const values = rows.sortValues(column);
-  if (ArrayBuffer.isView(values) && !(values instanceof BigUint64Array)) return new Float64Array(values as Int32Array);
-  const valueAt = typeof values === 'function' ? values : (row: number): unknown => values?.[row];
-  const keys = new Float64Array(rows.count);
+  if (ArrayBuffer.isView(values) && !(values instanceof BigUint64Array))
+    return { keys: new Float64Array(values as Int32Array) };
+  const valueAt = typeof values === 'function' ? values : (row: number): unknown => values?.[row] ?? null;
   if (rows.columns[column]!.isNumber && typeof values === 'function') {
+    const keys = new Float64Array(rows.count);
     await inPieces(rows.count, (row) => (keys[row] = Number(valueAt(row))));
-    return keys;
+    return { keys };
   }
-  const distinct = new Set<unknown>();
-  await inPieces(rows.count, (row) => distinct.add(valueAt(row)));
-  distinct.delete(null);
-  const ranks = ranksOf(distinct);
-  await inPieces(rows.count, (row) => (keys[row] = ranks.get(valueAt(row)) ?? NaN));
-  return keys;
+  const known = new Map<unknown, number>();
+  const places = new Uint32Array(rows.count);
+  await inPieces(rows.count, (row) => {
+    const value = valueAt(row);
+    const place = known.get(value) ?? known.size;
+    known.set(value, place);
+    places[row] = place;
+  });
+  return { values: [...known.keys()], places };
 }
 
 async function inPieces(count: number, take: (row: number) => unknown): Promise<void> {
@@ -52,9 +47,12 @@ export class Sorter {
   private lastId = 0;
   private readonly waiting = new Map<number, (sorted: Sorted) => void>();
 
-  async sort(rows: Rows, { column, isDescending }: SortOrder): Promise<void> {
-    const keys = await keysOf(rows, column);
-    this.send({ id: 0, keys, isDescending }, [keys.buffer as ArrayBuffer]);
+  /// Changes nothing if another order was asked for meanwhile.
+  async sort(rows: Rows, { column, isDescending }: SortOrder, isObsolete: () => boolean): Promise<void> {
+    const unsorted = await keysOf(rows, column);
+    if (isObsolete()) return;
+    const { buffer } = 'keys' in unsorted ? unsorted.keys : unsorted.places;
+    this.send({ id: 0, ...unsorted, isDescending }, [buffer as ArrayBuffer]);
   }
 
   /// The rows to show, in their order.

@@ -20,6 +20,21 @@ function sortable(keys: Float64Array, isDescending: boolean): Uint32Array {
   return halves;
 }
 
+const collator = new Intl.Collator('en', { numeric: true, sensitivity: 'base' });
+
+function compared(a: unknown, b: unknown): number {
+  if (typeof a === 'bigint' && typeof b === 'bigint') return a < b ? -1 : a > b ? 1 : 0;
+  return collator.compare(String(a), String(b));
+}
+
+/// What is no number has its place in the order of all values as its key. Null comes last.
+export function rankedKeys(values: unknown[], places: Uint32Array): Float64Array {
+  const order = Array.from(values, (_, place) => place).sort((a, b) => compared(values[a], values[b]));
+  const ranks = new Float64Array(values.length);
+  order.forEach((place, rank) => (ranks[place] = values[place] === null ? NaN : rank));
+  return Float64Array.from(places, (place) => ranks[place]!);
+}
+
 /// Rows by their keys, which are lost.
 export function orderOf(keys: Float64Array, isDescending: boolean): Uint32Array<ArrayBuffer> {
   const halves = sortable(keys, isDescending);

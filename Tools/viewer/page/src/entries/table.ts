@@ -129,6 +129,11 @@ export class Table {
     return this.isSelection ? Math.abs(this.selected - this.anchor) + 1 : 0;
   }
 
+  /// The number of rows that `wanted` returns.
+  get wantedCount(): number {
+    return this.selectedCount || this.shownCount;
+  }
+
   /// The rows that are selected, or all that are shown.
   *wanted(): Generator<number> {
     const first = this.isSelection ? Math.min(this.selected, this.anchor) : 0;

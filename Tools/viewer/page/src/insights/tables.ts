@@ -3,6 +3,7 @@
 import type { Table } from '#decoder';
 import { shiftedTable } from '../adjust/adjustment';
 import { Track } from '../model/track';
+import { wordsOf } from '../ui/words';
 
 export type TableName = 'zooms' | 'camera' | 'cursor_path';
 
@@ -45,7 +46,7 @@ export class InsightTables {
       this.events.onLoaded();
     } catch (error) {
       if (tracks === this.tracks)
-        this.events.onProblem(`A layer cannot be shown: ${error instanceof Error ? error.message : error}.`);
+        this.events.onProblem(`A layer cannot be shown: ${wordsOf(error)}.`);
     }
   }
 }

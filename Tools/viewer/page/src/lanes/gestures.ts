@@ -6,7 +6,7 @@ export interface Gestures {
   /// `way` is how far it is from the start.
   move?: (x: number, way: number, event: PointerEvent) => void;
   /// Went down and up again in the same place.
-  click?: (x: number, event: PointerEvent) => void;
+  click?: (x: number, event: PointerEvent) => unknown;
   /// Two fingers: around `x`, `factor` times as much is to be seen.
   pinch?: (x: number, factor: number) => void;
 }
@@ -50,4 +50,5 @@ export function dragging(element: HTMLElement, gestures: Gestures): void {
   };
   element.addEventListener('pointerup', end);
   element.addEventListener('pointercancel', end);
+  element.addEventListener('lostpointercapture', ({ pointerId }) => fingers.delete(pointerId)); // it may have gone
 }

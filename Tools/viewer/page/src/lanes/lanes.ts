@@ -2,7 +2,7 @@
 
 import { clickLabel, type Click } from '../model/clicks';
 import { StreamRows } from '../entries/rows';
-import { brief, titleOf } from '../model/format';
+import { brief, shown, titleOf } from '../model/format';
 import { Extremes } from '../model/extremes';
 import { keyCap } from '../model/keys';
 import type { Rect } from '../model/geometry';
@@ -56,22 +56,31 @@ const mostHidden = 12;
 
 const noteEnd = 0.6; // seconds after which a note is no longer that of the playhead
 
+/// Returns the lanes with the notes as they are now.
+export function withNotes(lanes: Lane[], session: Session, options: LaneOptions): Lane[] {
+  const notes = notesLane(session, options);
+  const others = lanes.filter(({ id }) => id !== notesTitle);
+  return notes ? [{ ...notes, id: notesTitle }, ...others] : others;
+}
+
+const notesTitle = 'Notes';
+
 function notesLane({ duration }: Session, { notes }: LaneOptions): NamelessLane | undefined {
   const all = notes();
   if (all.length === 0) return undefined;
   const times = Float64Array.from(all, ({ time }) => time);
   return {
-    title: 'Notes',
+    title: notesTitle,
     height: 23,
     draw: (canvas) =>
       drawBands(canvas, times, (index) => {
         const { bands, bandEdges } = canvas.palette;
         const [start, end] = [times[index]!, times[index + 1] ?? duration];
-        return { start, end, text: all[index]!.text, colour: bands[2]!, edge: bandEdges[2]! };
+        return { start, end, text: shown(all[index]!.text), colour: bands[2]!, edge: bandEdges[2]! };
       }),
     valueAt: (time) => {
       const index = lastAt(times, time);
-      return index >= 0 && time - times[index]! < noteEnd ? all[index]!.text : '';
+      return index >= 0 && time - times[index]! < noteEnd ? shown(all[index]!.text) : '';
     },
   };
 }

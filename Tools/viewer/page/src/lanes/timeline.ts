@@ -13,7 +13,7 @@ import { arrangeLanes } from './dialog';
 import { dragging } from './gestures';
 import { LaneLabel, type LabelEvents } from './labels';
 import { LaneCanvas, type Lane } from './lane';
-import { lanesOf, type LaneOptions } from './lanes';
+import { lanesOf, withNotes, type LaneOptions } from './lanes';
 import { Overview } from './overview';
 import { SelectionView } from '../range/view';
 
@@ -34,6 +34,7 @@ const arrangementKey = 'zulm-lanes';
 export class Timeline {
   range: Range = { from: 0, to: 1 };
   private session: Session | undefined;
+  private selected: Range | undefined;
   private duration = 1;
   /// All of the recording, in their usual order.
   lanes: Lane[] = [];
@@ -82,6 +83,7 @@ export class Timeline {
         anchor = shiftKey ? this.timeAt(x) : undefined;
         if (!shiftKey) this.events.onSeek(this.timeAt(x));
       },
+      click: (x, { shiftKey }) => shiftKey && this.events.onSelect(this.time, this.timeAt(x)),
       move: (x) => (anchor === undefined ? this.events.onSeek(this.timeAt(x)) : this.events.onSelect(anchor, this.timeAt(x))),
     });
     byId('timeline').addEventListener('keydown', (event) => this.selectByKey(event));
@@ -152,7 +154,7 @@ export class Timeline {
   /// Called after the notes changed.
   refreshLanes(): void {
     if (!this.session) return;
-    this.lanes = lanesOf(this.session, this.events);
+    this.lanes = withNotes(this.lanes, this.session, this.events);
     this.placeLanes();
   }
 
@@ -184,6 +186,7 @@ export class Timeline {
     const showedAll = this.range.to - this.range.from >= this.duration;
     this.duration = duration;
     this.overview.show(this.session, duration);
+    this.selection.show(this.selected, duration);
     this.ruler.setAttribute('aria-valuemax', duration.toFixed(3));
     this.setRange(showedAll ? { from: 0, to: duration } : this.range);
   }
@@ -205,6 +208,7 @@ export class Timeline {
   }
 
   showSelection(range: Range | undefined): void {
+    this.selected = range;
     this.selection.show(range, this.duration);
     this.drawSelection();
   }

@@ -8,5 +8,6 @@ export function decimal(value: number): string {
 
 /// Undefined if one of the texts is no plain number.
 export function decimalsOf(texts: string[]): number[] | undefined {
-  return texts.every((text) => /^-?\d+(\.\d+)?$/.test(text)) ? texts.map(Number) : undefined;
+  const numbers = texts.map((text) => (/^-?\d+(\.\d+)?$/.test(text) ? Number(text) : NaN));
+  return numbers.every(Number.isFinite) ? numbers : undefined; // many digits are infinite
 }

@@ -3,20 +3,33 @@
 import type { Placement } from './geometry';
 import { countBefore, countUntil } from './search';
 import type { Track } from './track';
+import { breath } from '../ui/breath';
 
 export const heatWidth = 128;
 export const heatHeight = 72;
 
+const piece = 100_000; // entries at a time
 const longestRest = 5; // seconds that one rest counts at most, so that it does not outshine everything else
 
 /// Seconds that the cursor spent in each cell of a grid over the recorded region, from 0 to 1 of the warmest, softened.
-export function heatOf(track: Track | undefined, placement: Placement, from: number, to: number): Float32Array {
+/// The page goes on meanwhile. The result means nothing if it has become obsolete.
+export async function heatOf(
+  track: Track | undefined,
+  placement: Placement,
+  from: number,
+  to: number,
+  isObsolete: () => boolean = () => false,
+): Promise<Float32Array> {
   const cells = new Float32Array(heatWidth * heatHeight);
   const [x, y] = [track?.column('x'), track?.column('y')];
   if (!track || !x || !y) return cells;
   const { region } = placement;
   const end = countBefore(track.times, to);
   for (let i = Math.max(0, countUntil(track.times, from) - 1); i < end; ++i) {
+    if (i % piece === piece - 1) {
+      await breath();
+      if (isObsolete()) return cells;
+    }
     const row = track.row(i);
     const column = Math.floor(((Number(x[row]) - region.x) / region.width) * heatWidth);
     const line = Math.floor(((Number(y[row]) - region.y) / region.height) * heatHeight);

@@ -11,11 +11,11 @@ export interface Stretch {
 /// How many seconds without activity are shown as idle.
 export const shortestIdle = 3;
 
-/// Takes the idle times as the library tells them, up to the end of the axis: a damaged time is not idleness.
+/// Takes the idle times as the library tells them, within the axis: a damaged time is not idleness.
 export function idleIn(table: Table | undefined, duration: number): Stretch[] {
   const track = table && new Track(table);
   const stretches = Array.from(track?.times ?? [], (start, i) => ({
-    start,
+    start: Math.max(0, start),
     end: Math.min(track!.number('end', i), duration),
   }));
   return stretches.filter(({ start, end }) => end - start >= shortestIdle);

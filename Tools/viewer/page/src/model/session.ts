@@ -44,6 +44,8 @@ export interface Decoded {
   name: string;
   container: string;
   duration: number | undefined;
+  /// Seconds that the recording lasts as the library sees it, which leaves damaged times out.
+  length: number;
   streams: StreamSummary[];
   entries: Entries[];
   /// The keys as captions show them.
@@ -99,7 +101,9 @@ export class Session {
     this.streams = decoded.streams;
     this.info = decoded.info;
     this.verify = decoded.verify;
-    for (const entries of decoded.entries) this.tracks.set(entries.kind, new Track(entries));
+    this.prepared = decoded.prepared;
+    for (const entries of decoded.entries)
+      this.tracks.set(entries.kind, new Track(entries, this.prepared?.order[entries.kind]));
     this.clearKeys = decoded.keys && new Track(decoded.keys.clear);
     this.maskedKeys = decoded.keys && new Track(decoded.keys.masked);
     this.hidden = decoded.hidden.map(({ stream, entries }) => ({
@@ -107,18 +111,17 @@ export class Session {
       track: entries && new Track(entries),
       reason: this.streams.some(({ uuid }) => uuid === stream.uuid)
         ? 'A later stream of its kind takes its place.'
-        : 'It lies behind damage, where readers do not look.',
+        : 'It comes after damage, where readers do not look.',
     }));
     this.region = region ?? this.recordedRegion();
     this.scaleFactor = this.lastNumber('recordingScaleFactor', 'scaleFactor') ?? 1;
     const { duration } = decoded;
     this.movieDuration = duration && Number.isFinite(duration) && duration > 0 ? duration : undefined;
-    this.duration = this.wholeDuration();
+    this.duration = Math.max(this.movieDuration ?? decoded.length, shortest);
     this.appearances = appearancesIn(decoded.appearances);
     this.clicks = clicksIn(decoded.clicks);
     this.markers = markersOf(this).filter((time) => time >= 0 && time <= this.duration);
     this.idle = idleIn(decoded.idle, this.duration);
-    this.prepared = decoded.prepared;
     this.speed = decoded.prepared?.speed ?? speedOf(this.track('cursorLocation'));
     this.speedExtremes = new Extremes(this.speed.values, decoded.prepared?.speedBounds);
   }
@@ -174,23 +177,9 @@ export class Session {
     const track = this.track(kind);
     return track?.count ? track.number(column, track.count - 1) : undefined;
   }
-
-  private wholeDuration(): number {
-    return Math.max(this.movieDuration ?? believableEnd([...this.tracks.values()].map(({ times }) => times)), shortest);
-  }
 }
 
 const shortest = 0.1; // seconds, so that there is something to show
-const day = 86400; // seconds
-const looked = 64; // times at the end of each stream
-
-/// The last time, without those that lie more than a day, and more than ten times as far as anything else, from the
-/// beginning: a damaged time must not squeeze everything else into nothing.
-export function believableEnd(streams: Float64Array[]): number {
-  const last = streams.flatMap((times) => [...times.subarray(-looked)]).sort((a, b) => a - b);
-  const bad = last.findIndex((time, i) => i > 0 && time > day && time > 10 * Math.max(1, last[i - 1]!));
-  return last[bad > 0 ? bad - 1 : last.length - 1] ?? 0;
-}
 
 export function rectAt(track: Track, index: number): Rect {
   return {

@@ -4,6 +4,14 @@ import type { Table } from '#decoder';
 import { shown } from './format';
 import { lastAt } from './search';
 
+/// The order of entries that are not stored in the order of their times.
+export interface Sorted {
+  /// The rows in the order of their times.
+  order: Uint32Array;
+  /// Their times.
+  times: Float64Array;
+}
+
 export class Track {
   readonly kind: string;
   /// Ascending and finite.
@@ -11,10 +19,19 @@ export class Track {
   /// The rows of the stream in the order of their times; null if the stream is in that order itself.
   private readonly order: Uint32Array | null;
 
-  constructor(readonly entries: Table) {
+  /// `sorted` is what `sortedOf` returns for the times, if it is known.
+  constructor(
+    readonly entries: Table,
+    sorted: Sorted | null = sortedOf(entries.time),
+  ) {
     this.kind = entries.kind;
-    this.order = isSorted(entries.time) ? null : orderOf(entries.time);
-    this.times = this.order ? Float64Array.from(this.order, (row) => entries.time[row]!) : entries.time;
+    this.order = sorted?.order ?? null;
+    this.times = sorted?.times ?? entries.time;
+  }
+
+  /// Whether the stream itself has the order of the times.
+  get isByTime(): boolean {
+    return this.order === null;
   }
 
   get count(): number {
@@ -67,6 +84,13 @@ export class Track {
   endOf(index: number, end: number): number {
     return index + 1 < this.count ? this.times[index + 1]! : Math.max(end, this.times[index]!);
   }
+}
+
+/// Returns null if the times are in order.
+export function sortedOf(times: Float64Array): Sorted | null {
+  if (isSorted(times)) return null;
+  const order = orderOf(times);
+  return { order, times: Float64Array.from(order, (row) => times[row]!) };
 }
 
 function isSorted(times: Float64Array): boolean {

@@ -5,6 +5,7 @@ import { joined, notesIn, notesText, sortedNotes, type Note, type NotesFormat } 
 import type { Session } from '../model/session';
 import { announce, byId, make, setText } from '../ui/dom';
 import { setIcon } from '../ui/icons';
+import { saveText } from '../ui/save';
 import { store, stored } from '../ui/storage';
 
 export interface NotesEvents {
@@ -21,9 +22,14 @@ const formats: [NotesFormat, string, string][] = [
   ['md', 'Markdown', 'text/markdown'],
 ];
 
+const mostBytes = 8_000_000; // of a file of notes
+
 export class NotesPane {
+  private isWarned = false;
   private session: Session | undefined;
+  /// At times of the movie. The browser keeps them at times of the recording.
   private notes: Note[] = [];
+  private offset = 0;
   private readonly list = make('ol', { class: 'notes' });
   private readonly status = make('output', { class: 'notes-status', 'aria-live': 'polite' });
   private readonly field = make('input', {
@@ -54,10 +60,20 @@ export class NotesPane {
     return this.notes;
   }
 
-  show(session: Session): void {
-    this.session = session;
-    this.notes = this.remembered();
+  /// `offset` is added to the times of the recording.
+  show(session: Session, offset: number): void {
+    [this.session, this.offset] = [session, offset];
+    this.notes = moved(this.remembered(), offset);
     this.fill();
+  }
+
+  /// Notes belong to the recording, and move with it.
+  setOffset(offset: number): void {
+    if (offset === this.offset) return;
+    this.notes = moved(this.notes, offset - this.offset);
+    this.offset = offset;
+    this.fill();
+    this.events.onChange();
   }
 
   focusField(): void {
@@ -85,8 +101,12 @@ export class NotesPane {
   }
 
   private keep(told: string): void {
-    const { notes } = this;
-    store(this.key, notes.length > 0 ? notesText(notes, this.session?.name ?? '', 'json') : null);
+    const notes = moved(this.notes, -this.offset);
+    const isKept = store(this.key, notes.length > 0 ? notesText(notes, this.session?.name ?? '', 'json') : null);
+    if (!isKept && !this.isWarned) {
+      this.isWarned = true;
+      this.events.onProblem('This browser does not keep notes for the next visit. Save them as a file before you leave.');
+    }
     announce(told);
     this.events.onChange();
   }
@@ -121,30 +141,38 @@ export class NotesPane {
   /// An empty note is removed. Any other keeps its element: the button that the reader presses next has to stay there.
   private rewrite(note: Note, text: string): void {
     if (!text) return this.change(this.notes.filter((other) => other !== note), 'Note removed');
+    if (text === shown(note.text)) return; // the field shows hidden characters, which the note keeps
     note.text = text;
     this.keep('Note changed');
   }
 
   private save(format: NotesFormat, type: string): void {
     const name = this.session?.name ?? 'Recording';
-    const url = URL.createObjectURL(new Blob([notesText([...this.notes], name, format)], { type }));
-    make('a', { href: url, download: `${name} notes.${format}` }).click();
-    setTimeout(() => URL.revokeObjectURL(url), 10_000);
+    saveText(`${name} notes.${format}`, notesText(this.notes, name, format), type);
   }
 
   private async import(): Promise<void> {
     const [file] = this.file.files ?? [];
+    const { session } = this;
     this.file.value = '';
     if (!file) return;
     try {
+      if (file.size > mostBytes) throw new Error('it is larger than any file of notes');
       const notes = notesIn(await file.text());
-      this.change(joined(this.notes, notes), `${plural(notes.length, 'note')} imported`);
-    } catch {
+      if (session !== this.session) return; // they are about the recording before
+      const all = joined(this.notes, notes);
+      this.change(all, `${plural(all.length - this.notes.length, 'note')} imported`);
+    } catch (error) {
+      const reason = error instanceof Error && error.message.startsWith('it ') ? error.message : 'it holds no notes';
       this.events.onProblem(
-        `${file.name} holds no notes. Choose a JSON, CSV or Markdown file that was saved by a page like this one.`,
+        `${reason.replace('it', () => file.name)}. Choose a JSON, CSV or Markdown file that was saved by a page like this one.`,
       );
     }
   }
+}
+
+function moved(notes: Note[], offset: number): Note[] {
+  return notes.map(({ time, text }) => ({ time: Number((time + offset).toFixed(6)), text }));
 }
 
 function button(

@@ -2,12 +2,13 @@
 
 import type { Table } from '#decoder';
 import { copyText } from '../entries/copy';
-import { clock, count, plural } from '../model/format';
+import { clock, count, plural, shown } from '../model/format';
 import { decimal } from '../model/decimals';
 import { Track } from '../model/track';
 import { announce, byId, make, setText } from '../ui/dom';
 import { setIcon } from '../ui/icons';
 import { saveText } from '../ui/save';
+import { wordsOf } from '../ui/words';
 import { concatListOf, editListOf } from './exports';
 import type { Range } from '../lanes/axis';
 import type { Selection } from './selection';
@@ -16,6 +17,7 @@ export interface RangeEvents {
   /// Asks the library about the activity and the applications in a range of the movie's time.
   insights: (range: Range) => Promise<Table[]>;
   movieName: () => string;
+  hasMovie: () => boolean;
   link: () => string;
   onZoom: (range: Range) => void;
   onFilter: (range: Range) => void;
@@ -30,6 +32,7 @@ export class RangeBar {
   private readonly facts = make('output', { class: 'range-facts', 'aria-live': 'off' });
   private readonly loop: HTMLButtonElement;
   private readonly heat: HTMLButtonElement;
+  private readonly concat: HTMLButtonElement;
   private timer: ReturnType<typeof setTimeout> | undefined;
   private asked = 0;
   private isAsking = false;
@@ -51,6 +54,7 @@ export class RangeBar {
     };
     this.loop = tool('loop', 'Loop', 'Play the selection again and again  r', () => this.switchLoop());
     this.heat = tool('heat', 'Heat map', 'Heat map of the selection', () => this.switchHeat());
+    this.concat = tool('save', 'Save as a list for ffmpeg', 'Save a list for the concat demuxer of ffmpeg', (range) => this.saveConcat(range), 'ffmpeg');
     this.element.append(
       make('div', { class: 'range-words' }, this.times, this.facts),
       make(
@@ -63,7 +67,7 @@ export class RangeBar {
         tool('copy', 'Copy', 'Copy what is said here', () => this.copy(this.text(), 'The selection is copied')),
         tool('link', 'Copy a link', 'Copy a link to it', () => this.copy(events.link(), 'The link is copied')),
         tool('save', 'Edits: save as an edit list', 'Save an edit list for zulm cut and zulm retime', (range) => this.saveEdits(range), 'Edits'),
-        tool('save', 'Save as a list for ffmpeg', 'Save a list for the concat demuxer of ffmpeg', (range) => this.saveConcat(range), 'ffmpeg'),
+        this.concat,
         tool('close', 'Select nothing', 'Select nothing  Esc', () => selection.clear()),
       ),
     );
@@ -83,6 +87,7 @@ export class RangeBar {
     this.makeRoom();
     this.loop.setAttribute('aria-pressed', String(loops));
     this.heat.setAttribute('aria-pressed', String(hasHeat));
+    this.concat.disabled = !this.events.hasMovie();
     if (range === this.told) return;
     this.told = range;
     const asked = ++this.asked;
@@ -112,7 +117,7 @@ export class RangeBar {
       const tables = await this.events.insights(range);
       if (asked === this.asked) this.tell(...(tables.map((table) => new Track(table)) as [Track, Track]));
     } catch (error) {
-      if (asked === this.asked) this.events.onProblem(`The selection cannot be looked at: ${error instanceof Error ? error.message : error}.`);
+      if (asked === this.asked) this.events.onProblem(`The selection cannot be looked at: ${wordsOf(error)}.`);
     } finally {
       this.isAsking = false;
       if (asked === this.asked) this.element.classList.remove('is-asking');
@@ -123,7 +128,7 @@ export class RangeBar {
   private tell(activity: Track, applications: Track): void {
     const number = (name: string) => activity.number(name, 0);
     const names = Array.from({ length: applications.count }, (_, i) => ({
-      name: applications.entries.columns.name![i] || 'No name',
+      name: shown(String(applications.entries.columns.name![i] || 'No name')),
       time: `${clock(Number(applications.entries.columns.duration![i]), 1)}`,
     }));
     const known: [string, string][] = [
@@ -155,7 +160,7 @@ export class RangeBar {
       await copyText(text);
       announce(done);
     } catch (error) {
-      this.events.onProblem(`The selection could not be copied: ${error instanceof Error ? error.message : error}.`);
+      this.events.onProblem(`The selection could not be copied: ${wordsOf(error)}.`);
     }
   }
 

@@ -23,8 +23,11 @@ export class Selection {
     [this.duration, this.selected, this.loops, this.hasHeat] = [duration, undefined, false, false];
   }
 
+  /// What lies beyond the new end is selected no longer.
   setDuration(duration: number): void {
     this.duration = duration;
+    const { selected } = this;
+    if (selected && selected.to > duration) this.select(selected.from, selected.to);
   }
 
   /// Between two times in any order.
@@ -36,20 +39,34 @@ export class Selection {
     this.changed();
   }
 
+  /// The heat map tells of the range no longer.
+  dropHeat(): void {
+    if (!this.hasHeat) return;
+    this.hasHeat = false;
+    this.onChange();
+  }
+
   clear(): void {
     this.selected = undefined;
     this.changed();
   }
 
-  /// The range begins at `time`. Its end stays if it is later.
-  setIn(time: number): void {
+  /// The range begins at `time`. Its end stays if it is later. Returns false if nothing is left to select.
+  setIn(time: number): boolean {
     const { to } = this.selected ?? { to: this.duration };
-    this.select(time, to > time ? to : this.duration);
+    return this.selectSome(time, to > time ? to : this.duration);
   }
 
-  setOut(time: number): void {
+  /// The range ends at `time`, as `setIn` begins it.
+  setOut(time: number): boolean {
     const { from } = this.selected ?? { from: 0 };
-    this.select(from < time ? from : 0, time);
+    return this.selectSome(from < time ? from : 0, time);
+  }
+
+  private selectSome(from: number, to: number): boolean {
+    if (to - from < shortest) return false;
+    this.select(from, to);
+    return true;
   }
 
   /// The selection ends at `time`. A new one begins at `start`.

@@ -33,12 +33,14 @@ export class CursorImages {
   }
 
   private async decode(bytes: Uint8Array): Promise<void> {
+    const { recording } = this;
     this.images.set(bytes, 'decoding');
-    try {
-      this.images.set(bytes, await bitmapOf(bytes));
-    } catch {
-      this.images.set(bytes, 'failed');
+    const image = await bitmapOf(bytes).catch(() => 'failed' as const);
+    if (recording === this.recording) {
+      this.images.set(bytes, image);
+      this.onDecoded();
+    } else if (image instanceof ImageBitmap) {
+      image.close();
     }
-    this.onDecoded();
   }
 }

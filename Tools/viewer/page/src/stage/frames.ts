@@ -46,6 +46,14 @@ export class FrameLengths {
   }
 }
 
+/// Browsers round times to microseconds, which would add up over thousands of pictures. Returns the length that pictures
+/// have at a whole rate, or at 1000/1001 of one, if that is the length seen.
+export function exactLength(length: number): number {
+  const rates = [Math.round(1 / length), (Math.round(1.001 / length) * 1000) / 1001];
+  const rate = rates.find((rate) => Math.abs(1 / rate - length) < 0.000002);
+  return rate ? 1 / rate : length;
+}
+
 /// A time at which the picture is shown that begins at `time`, or the one that holds then. Browsers and movies round
 /// the beginning of a picture, each in its own way.
 export function inside(time: number): number {

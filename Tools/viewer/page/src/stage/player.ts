@@ -2,7 +2,7 @@
 
 import type { Size } from '../model/geometry';
 import type { Range } from '../lanes/axis';
-import { FrameLengths, inside, nextFrame, previousFrame } from './frames';
+import { exactLength, FrameLengths, inside, nextFrame, previousFrame } from './frames';
 
 export type MovieState = 'none' | 'loading' | 'ready' | 'failed';
 
@@ -37,6 +37,9 @@ export class Player {
   private timer: ReturnType<typeof setTimeout> | undefined;
   private steps = 0;
   private isStepping = false;
+  private stepping = Promise.resolve();
+  /// Where skipping led last. The picture of that place may begin earlier, so nothing is skipped before it.
+  private skippedTo = -Infinity;
   /// The number of times that the reader went somewhere.
   private journeys = 0;
   private followsPicture = false;
@@ -96,6 +99,12 @@ export class Player {
   /// Whether the movie shows the picture of `time`.
   get isSettled(): boolean {
     return this.movie !== 'loading' && this.wanted === undefined && !this.isStepping;
+  }
+
+  /// Resolves when the movie shows the picture of `time`.
+  async settled(): Promise<void> {
+    await this.arrival();
+    await this.stepping;
   }
 
   get rate(): number {
@@ -161,7 +170,7 @@ export class Player {
 
   seek(time: number): void {
     this.position = this.target = this.limited(time);
-    [this.steps, this.followsPicture] = [0, this.playing && !this.isBackward];
+    [this.steps, this.skippedTo, this.followsPicture] = [0, -Infinity, this.playing && !this.isBackward];
     ++this.journeys;
     if (this.movie === 'ready') this.seekMovie(inside(this.position));
     if (this.playing) this.playMovie();
@@ -176,7 +185,7 @@ export class Player {
       return this.seek(expected);
     this.position = expected; // until the movie has shown it
     this.steps += direction;
-    if (!this.isStepping) void this.takeSteps();
+    if (!this.isStepping) this.stepping = this.takeSteps();
     this.onChange();
   }
 
@@ -188,16 +197,30 @@ export class Player {
     if (this.isBackward) return this.goBack(passed);
     if (this.isMovieRunning()) this.position = this.runningTime(now);
     else if (this.wanted === undefined) this.position += Math.max(0, passed) * this.speed;
-    const elsewhere = this.loop && this.position >= this.loop.to ? this.loop.from : this.skip(this.position);
-    if (elsewhere !== undefined) return this.seek(elsewhere);
+    if (this.goElsewhere()) return;
     if (this.position < this.duration) return;
     this.position = this.duration;
     this.pause();
   }
 
+  /// Back to the beginning of the loop, or to the end of what is skipped.
+  private goElsewhere(): boolean {
+    const { loop, position } = this;
+    if (loop && position >= loop.to) {
+      this.seek(loop.from);
+      return true;
+    }
+    const target = position < this.skippedTo ? undefined : this.skip(position);
+    if (target === undefined || (loop && target >= loop.to)) return false;
+    this.seek(target);
+    this.skippedTo = this.position;
+    return true;
+  }
+
   /// Shows the picture that the clock has reached as soon as the one before has been found.
   private goBack(passed: number): void {
     this.target = this.limited(this.target - Math.max(0, passed) * this.backward);
+    if (this.loop && this.target <= this.loop.from) [this.target, this.picture] = [this.loop.to, NaN]; // to be looked for
     if (this.movie !== 'ready' || this.target > this.movieLength()) this.position = this.target;
     else if (this.wanted === undefined && !(this.target >= this.picture)) this.seekMovie(inside(this.target));
     if (this.target > 0) return;
@@ -205,16 +228,21 @@ export class Player {
     this.seek(0);
   }
 
-  /// Finds out how long a picture lasts, as far as the movie can show it. Resolves with the length in seconds.
-  async frameLength(): Promise<number> {
-    if (this.movie === 'ready' && !this.lengths.isKnown && !this.isStepping) {
+  /// Finds out when a picture begins, if all are as long as those that were seen; the first one has the number 0.
+  /// Resolves with undefined if the reader went elsewhere meanwhile.
+  async frameTime(frame: number): Promise<number | undefined> {
+    let { journeys } = this;
+    await this.stepping;
+    if (journeys !== this.journeys) return undefined;
+    if (this.movie === 'ready' && !this.lengths.isKnown) {
       this.pause();
       this.seek(0);
+      ({ journeys } = this);
       await this.arrival();
       this.steps = 1;
-      if (!Number.isNaN(this.picture)) await this.takeSteps();
+      if (!Number.isNaN(this.picture)) await (this.stepping = this.takeSteps());
     }
-    return this.lengths.length;
+    return journeys === this.journeys ? frame * exactLength(this.lengths.length) : undefined;
   }
 
   private limited(time: number): number {

@@ -32,12 +32,17 @@ export class Stage {
   readonly zoom = new StageZoom();
   placement: Placement = placementOf(undefined, 1, undefined);
   showsKeys = false;
+  /// Called when something that was missing can be drawn.
+  onReady: () => void = () => {};
   private session: Session | undefined;
   private clickStarts = new Float64Array();
   private shownCaption = '';
-  private heat: { picture: HTMLCanvasElement; from: number; to: number } | undefined;
+  /// The heat map that was asked for last, and the one that is there.
+  private askedHeat = '';
+  private heat: HTMLCanvasElement | undefined;
   private heatRange = { from: 0, to: 0 };
   private width = 0;
+  private laidFor = '';
   private readonly element = byId('stage');
   private readonly frame = byId('frame');
   private readonly picture = byId<HTMLCanvasElement>('picture');
@@ -54,15 +59,23 @@ export class Stage {
   show(session: Session): void {
     this.session = session;
     this.clickStarts = Float64Array.from(session.clicks, ({ start }) => start);
-    this.heat = undefined;
+    [this.askedHeat, this.heat] = ['', undefined];
     this.images.clear();
     this.lay();
+  }
+
+  /// Called when the movie may have changed.
+  fit(): void {
+    const { movie, size } = this.player;
+    if (`${movie} ${size?.width} ${size?.height}` === this.laidFor) this.drawPicture();
+    else this.lay();
   }
 
   /// Gives the frame the shape of the movie, or of the recorded region where there is none.
   lay(): void {
     if (!this.session) return;
     const { movie, size } = this.player;
+    this.laidFor = `${movie} ${size?.width} ${size?.height}`;
     this.placement = placementOf(this.session.region, this.session.scaleFactor, size);
     const place = fitted(this.placement.frame, {
       width: this.element.clientWidth,
@@ -150,6 +163,7 @@ export class Stage {
     const context = canvas.getContext('2d');
     const { session, player } = this;
     if (!session || !context) throw new Error('nothing is open');
+    await player.settled();
     if (player.movie === 'ready') context.drawImage(player.video, 0, 0, canvas.width, canvas.height);
     this.drawLayers(context, this.sceneAt(session, player.time, Math.max(1, frame.width / 1280)));
     drawCaption(context, this.captionAt(player.time), frame, palette().font);
@@ -159,7 +173,8 @@ export class Stage {
   private drawLayers(context: CanvasRenderingContext2D, scene: Scene): void {
     const isOn = (id: LayerId) => layers.some((layer) => layer.id === id && layer.isOn);
     byId('heat-legend').hidden = !isOn('heat');
-    if (isOn('heat')) drawHeat(context, scene, this.heatPicture());
+    const heat = isOn('heat') ? this.heatPicture() : undefined;
+    if (heat) drawHeat(context, scene, heat);
     if (isOn('zooms')) drawZoom(context, scene);
     if (isOn('window')) drawWindow(context, scene);
     if (isOn('hover')) drawHover(context, scene);
@@ -170,14 +185,27 @@ export class Stage {
     if (isOn('cursor')) drawCursor(context, scene);
   }
 
-  private heatPicture(): HTMLCanvasElement {
+  /// Returns the map that is there, and makes the one that is wanted.
+  private heatPicture(): HTMLCanvasElement | undefined {
     const { from, to } = this.heatRange;
-    if (this.heat && this.heat.from === from && this.heat.to === to) return this.heat.picture;
-    const heat = heatOf(this.session?.track('cursorLocation'), this.placement, from, to);
+    const { x, y, width, height } = this.placement.region;
+    const wanted = [from, to, x, y, width, height].join();
+    if (wanted !== this.askedHeat) {
+      this.askedHeat = wanted;
+      void this.makeHeat(wanted, from, to);
+    }
+    return this.heat;
+  }
+
+  private async makeHeat(wanted: string, from: number, to: number): Promise<void> {
+    const { session, placement } = this;
+    const isObsolete = () => session !== this.session || wanted !== this.askedHeat;
+    const heat = await heatOf(session?.track('cursorLocation'), placement, from, to, isObsolete);
+    if (isObsolete()) return;
     const picture = make('canvas', { width: heatWidth, height: heatHeight });
     picture.getContext('2d')?.putImageData(new ImageData(heatColours(heat), heatWidth, heatHeight), 0, 0);
-    this.heat = { picture, from, to };
-    return picture;
+    this.heat = picture;
+    this.onReady();
   }
 
   /// What is typed at the moment, as far as the reader may see it.

@@ -50,9 +50,9 @@ function go(page: Page, field: HTMLInputElement): boolean {
   return true;
 }
 
-/// The first picture has the number 0. All are as long as the shortest one that was seen.
 async function goToFrame(page: Page, frame: number): Promise<void> {
-  const length = await page.player.frameLength();
-  page.seek(frame * length);
+  const time = await page.player.frameTime(frame);
+  if (time === undefined) return;
+  page.seek(time);
   announce(`Picture ${frame} at ${clock(page.player.time)}`);
 }

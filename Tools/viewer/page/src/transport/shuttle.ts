@@ -2,7 +2,7 @@
 
 import type { Player } from '../stage/player';
 
-export const rates = [0.25, 0.5, 1, 1.5, 2, 4, 8, 16]; // browsers refuse faster ones
+const rates = [0.25, 0.5, 1, 1.5, 2, 4, 8, 16]; // browsers refuse faster ones
 
 const speeds = [1, 2, 4, 8, 16];
 
@@ -23,4 +23,12 @@ export function shuttleBack(player: Player): void {
 export function shuttleStop(player: Player): void {
   player.pause();
   player.rate = 1;
+}
+
+const next = (rate: number) => rates[(rates.indexOf(rate) + 1) % rates.length]!;
+
+/// By the button of the speed, which has all rates. Time that goes back keeps going back.
+export function shuttleNext(player: Player): void {
+  if (player.isBackward) player.playBackward(next(-player.speedShown));
+  else player.rate = next(player.rate);
 }

@@ -2,13 +2,18 @@
 
 const channel = new MessageChannel();
 const waiting: (() => void)[] = [];
-channel.port1.onmessage = () => waiting.shift()?.();
-// An open port would keep a program in Node from ending.
-(channel.port1 as { unref?: () => void }).unref?.();
+/// An open port keeps a program in Node from ending, as it should while somebody waits.
+const port: MessagePort & { ref?: () => void; unref?: () => void } = channel.port1;
+port.onmessage = () => {
+  waiting.shift()?.();
+  if (waiting.length === 0) port.unref?.();
+};
+port.unref?.();
 
 export function breath(): Promise<void> {
   return new Promise((done) => {
     waiting.push(done);
+    port.ref?.();
     channel.port2.postMessage(null);
   });
 }

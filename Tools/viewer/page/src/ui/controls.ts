@@ -3,7 +3,7 @@
 import { clock, spokenTime } from '../model/format';
 import { layers } from '../stage/layers';
 import { byId, make, setText } from './dom';
-import { rates } from '../transport/shuttle';
+import { shuttleNext } from '../transport/shuttle';
 import { setUpClock } from '../transport/clock';
 import { setUpStage } from '../stage/handling';
 import { setIcon } from './icons';
@@ -22,7 +22,7 @@ export function setUpControls(page: Page): Controls {
   on('frame-forward', () => page.stepFrame(1));
   on('marker-back', () => page.stepMarker(-1));
   on('marker-forward', () => page.stepMarker(1));
-  on('rate', () => (page.player.rate = rates[(rates.indexOf(page.player.rate) + 1) % rates.length]!));
+  on('rate', () => shuttleNext(page.player));
   on('sound', () => (page.player.muted = !page.player.muted));
   on('keys-button', () => page.switchKeys());
   on('full-screen', () => void switchFullScreen());
@@ -35,6 +35,10 @@ export function setUpControls(page: Page): Controls {
   on('save-still', () => page.saveStill());
   on('select-some', () => page.selectSome());
   setUpMenu('more-button', 'more-menu');
+  byId('skip').addEventListener('click', (event) => {
+    event.preventDefault(); // the address holds other things
+    byId('timeline').focus();
+  });
   setUpClock(page);
   setUpStage(page);
   document.addEventListener('fullscreenchange', () => showTime(page.player.time, page.player.duration));

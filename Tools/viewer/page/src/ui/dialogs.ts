@@ -102,9 +102,11 @@ export function setUpDialogs(): void {
   const help = byId<HTMLDialogElement>('help-dialog');
   const about = byId<HTMLDialogElement>('about-dialog');
   fillDialog(help, 'help-title', 'Keys and gestures', rows(keys), make('h3', {}, 'Pointer'), rows(gestures));
-  fillDialog(about, 'about-title', 'About this page', ...aboutContent());
   byId('help-button').addEventListener('click', showHelp);
-  byId('about-button').addEventListener('click', () => about.showModal());
+  byId('about-button').addEventListener('click', () => {
+    fillDialog(about, 'about-title', 'About this page', ...aboutContent());
+    about.showModal();
+  });
 }
 
 export function showHelp(): void {

@@ -26,9 +26,10 @@ export function setText(element: HTMLElement, text: string): void {
   if (element.textContent !== text) element.textContent = text;
 }
 
-/// Says it to people who listen.
+/// Says it to people who listen. The same text is said again.
 export function announce(text: string): void {
-  setText(byId('announcer'), text);
+  const announcer = byId('announcer');
+  setText(announcer, announcer.textContent === text ? `${text}\u00a0` : text);
 }
 
 /// A canvas as large as its place on the page, in the screen's own pixels.

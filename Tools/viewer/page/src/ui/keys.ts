@@ -5,6 +5,7 @@ import { editClock } from '../transport/clock';
 import { layers } from '../stage/layers';
 import { switchFullScreen } from './controls';
 import { showHelp } from './dialogs';
+import { announce } from './dom';
 import type { Page } from './page';
 
 export function setUpKeys(page: Page): void {
@@ -32,8 +33,8 @@ export function setUpKeys(page: Page): void {
     j: () => shuttleBack(page.player),
     k: () => shuttleStop(page.player),
     l: () => shuttleOn(page.player),
-    i: () => page.selection.setIn(page.player.time),
-    o: () => page.selection.setOut(page.player.time),
+    i: () => page.selection.setIn(page.player.time) || announce('Nothing comes after the playhead'),
+    o: () => page.selection.setOut(page.player.time) || announce('Nothing comes before the playhead'),
     r: () => page.switchLoop(),
     s: () => page.switchSkipping(),
     g: () => editClock(page),

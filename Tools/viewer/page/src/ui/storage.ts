@@ -8,12 +8,13 @@ export function stored(key: string): string | null {
   }
 }
 
-/// Null forgets it.
-export function store(key: string, value: string | null): void {
+/// Null forgets it. Returns false if the browser does not keep it longer than for this visit.
+export function store(key: string, value: string | null): boolean {
   try {
     if (value === null) localStorage.removeItem(key);
     else localStorage.setItem(key, value);
+    return true;
   } catch {
-    // it holds for this visit
+    return false;
   }
 }

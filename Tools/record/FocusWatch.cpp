@@ -1,0 +1,113 @@
+#include "Tools/record/FocusWatch.h"
+
+#include <utility>
+
+namespace Recorder {
+
+namespace {
+
+constexpr Instant s_askInterval = 50 * s_millisecond;     ///< while keys wait for an answer
+constexpr Instant s_searchInterval = 200 * s_millisecond; ///< while the focus is not known
+constexpr Instant s_firstPause = s_second;
+constexpr Instant s_laterPause = 5 * s_second;
+
+} // namespace
+
+FocusWatch::FocusWatch(std::string display, PrivacyFilter& privacy, std::function<void(const std::string&)> tell)
+    : display_(std::move(display)), privacy_(privacy), tell_(std::move(tell)), pause_(s_firstPause) {}
+
+FocusWatch::Bus FocusWatch::reach(Instant until) {
+    process_ = std::make_unique<AccessibilityProcess>(display_);
+    process_->waitUntilReady(until);
+    if (!process_->isAlive()) {
+        process_.reset();
+        return Bus::Absent;
+    }
+    privacy_.requireFocus(true);
+    wasReady_ = process_->isReady();
+    return wasReady_ ? Bus::Ready : Bus::Late;
+}
+
+void FocusWatch::follow(WindowObserver& windows, const PointerObserver& pointer) {
+    windows_ = &windows;
+    pointer_ = &pointer;
+    hover();
+}
+
+void FocusWatch::start() {
+    startAt_.reset();
+    process_ = std::make_unique<AccessibilityProcess>(display_);
+    process_->windowChanged(windows_->process());
+}
+
+void FocusWatch::lost() {
+    privacy_.setFocus(now(), Focus::Unknown);
+    hovered_.reset();
+    const bool isAbsent = process_->isAbsent();
+    process_.reset();
+    if (isAbsent && !wasReady_) { // it was only slow to say that there is no bus
+        privacy_.requireFocus(false);
+        return;
+    }
+    if (pause_ == s_firstPause)
+        tell_("the accessibility bus does not answer: keys are left out until it does");
+    startAt_ = now() + pause_;
+    pause_ = s_laterPause;
+}
+
+void FocusWatch::windowChanged(Instant instant, std::uint32_t process) {
+    privacy_.setFocus(instant, Focus::Unknown);
+    hovered_.reset();
+    if (!process_)
+        return;
+    process_->windowChanged(process);
+    process_->ask(0);
+}
+
+void FocusWatch::hover() {
+    const std::optional<Position> pointer = pointer_->position();
+    if (std::exchange(wasDenied_, privacy_.isDenied()) != privacy_.isDenied())
+        hovered_.reset();
+    if (!pointer || pointer == hovered_ || privacy_.isDenied())
+        return;
+    const bool asks = process_ && process_->isReady() && windows_->process() != 0;
+    if (asks && !process_->askHover(*pointer))
+        return; // until the earlier question is answered, even if the pointer rests from now on
+    hovered_ = pointer;
+    if (!asks)
+        windows_->hover(now(), *pointer);
+}
+
+void FocusWatch::noteHover(const std::optional<Area>& area) {
+    if (area)
+        windows_->noteHover(now(), *area);
+    else if (const auto pointer = pointer_->position())
+        windows_->hover(now(), *pointer);
+}
+
+void FocusWatch::serve(bool hasWaitingKeys) {
+    if (startAt_ && now() >= *startAt_)
+        start();
+    if (!process_)
+        return;
+    const AccessibilityEvents events{[this](std::uint32_t process, Focus focus) {
+                                         if (process == windows_->process())
+                                             privacy_.setFocus(now(), focus);
+                                     },
+                                     [this](Instant asked, Focus focus) {
+                                         privacy_.setFocus(now(), focus);
+                                         if (focus != Focus::Unknown)
+                                             privacy_.confirm(asked);
+                                     },
+                                     [this](const std::optional<Area>& area) { noteHover(area); }};
+    process_->serve(events);
+    wasReady_ = wasReady_ || process_->isReady();
+    if (!process_->isAlive())
+        lost();
+    else if (hasWaitingKeys)
+        process_->ask(s_askInterval);
+    else if (privacy_.isFocusUnknown())
+        process_->ask(s_searchInterval);
+}
+
+} // namespace Recorder
