@@ -1,7 +1,7 @@
 #include "Tools/render/Style.h"
 
-#include "ShippedStyles.h"
 #include "Tools/render/JsonFields.h"
+#include "Tools/render/ShippedStyles.h"
 #include "Tools/zulm/Failure.h"
 
 #include <fmt/core.h>

@@ -28,8 +28,8 @@ bool makeShortcut(Modifiers modifiers) {
     return !modifiers.empty();
 }
 
-/// Returns whether modifiers keep a key from typing a character. Alt types the third sign of a key on many keyboards, and
-/// so does Control with Alt.
+/// Returns whether modifiers keep a key from typing a character. Alt types the third sign of a key on many keyboards,
+/// and so does Control with Alt.
 bool keepFromTyping(Modifiers modifiers) {
     const bool hasCommand = modifiers.contains(Modifier::Command) || modifiers.contains(Modifier::Windows);
     return hasCommand || (modifiers.contains(Modifier::Control) && !modifiers.contains(Modifier::Alt));
