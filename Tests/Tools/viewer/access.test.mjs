@@ -5,7 +5,7 @@ import { readFileSync, writeFileSync } from 'node:fs';
 import { join } from 'node:path';
 import { test } from 'node:test';
 import { attached, positionsOf } from './numbered.mjs';
-import { axeSource, emptyPage, folder, open, opened, ready, recordedSession, seek, waitUntil } from './support.mjs';
+import { axeSource, emptyPage, enlarge, folder, open, opened, ready, recordedSession, seek, waitUntil } from './support.mjs';
 
 const recording = recordedSession();
 const empty = join(folder, 'empty.html');
@@ -93,12 +93,15 @@ for (const [size, text] of [
   [[1440, 900], 200],
   [[720, 450], 100], // 1440 by 900, everything twice as large
   [[500, 900], 200],
+  [[1280, 800], 200],
+  [[1024, 768], 200],
+  [[360, 740], 200],
 ])
   test(`nothing is cut or covered at ${size.join(' by ')}, text at ${text} %`, async () => {
     const { page, close } = await open(recording.page, { size });
-    await page.evaluate((text) => (document.documentElement.style.fontSize = text === 100 ? '' : `${(16 * text) / 100}px`), text);
     await opened(page);
     await ready(page);
+    await enlarge(page, text);
     const { width, stage } = await page.evaluate(() => ({
       width: document.documentElement.scrollWidth,
       stage: document.getElementById('frame').getBoundingClientRect().width,
@@ -108,22 +111,79 @@ for (const [size, text] of [
     assert.deepEqual(await page.evaluate(hiddenControls), []);
     await selectAll(page);
     assert.deepEqual(await page.evaluate(hiddenControls), [], 'with a selection');
+    const rows = await page.evaluate(() => {
+      const { clientHeight } = document.querySelector('.table');
+      return (clientHeight - document.querySelector('.table-head').offsetHeight) / document.querySelector('.table-row').offsetHeight;
+    });
+    assert.ok(rows >= 3, `the table has room for ${rows} rows`);
+    await page.evaluate(() => scrollTo(0, 0));
+    await seek(page, 4.35);
+    const [movie, caption] = [await page.locator('#frame').boundingBox(), await page.locator('#caption').boundingBox()];
+    const covered = (caption.width * caption.height) / (movie.width * movie.height);
+    assert.ok(covered < 0.12, `the caption covers ${(100 * covered).toFixed(0)} % of the movie`);
     for (const id of ['frame-back', 'frame-forward', 'full-screen', 'clock-total'])
       assert.ok(await page.locator(`#${id}`).isVisible(), id);
     await close();
   });
 
 test('the movie stays in sight where the page scrolls', async () => {
-  for (const size of [[360, 740], [720, 450]]) {
+  for (const [size, text] of [
+    [[360, 740], 100],
+    [[720, 450], 100],
+    [[1024, 768], 200],
+    [[360, 740], 200],
+  ]) {
     const { page, close } = await open(recording.page, { size });
     await opened(page);
     await ready(page);
+    await enlarge(page, text);
     await page.evaluate(() => scrollTo(0, document.documentElement.scrollHeight));
     await page.waitForFunction(() => scrollY > 100);
     const { y, height } = await page.locator('#frame').boundingBox();
     assert.ok(y >= 0 && height > 100 && y + height < size[1] * 0.7, `${y} to ${y + height}`);
     await close();
   }
+});
+
+test('whoever goes from control to control by the keys sees each of them', async () => {
+  for (const [size, text] of [
+    [[1024, 768], 100],
+    [[360, 740], 100],
+    [[1024, 768], 200],
+    [[360, 740], 200],
+  ]) {
+    const { page, close } = await open(recording.page, { size, hash: '#t=4.35&range=3-9' });
+    await opened(page);
+    await ready(page);
+    await enlarge(page, text);
+    const covered = [];
+    for (let i = 0; i < 60; ++i) {
+      await page.keyboard.press('Tab');
+      const name = await page.evaluate(() => {
+        const element = document.activeElement;
+        const { left, right, top, bottom } = element.getBoundingClientRect();
+        const parts = [0.1, 0.3, 0.5, 0.7, 0.9];
+        const isSeen = parts.flatMap((x) => parts.map((y) => [x, y])).some(([x, y]) => {
+          const seen = document.elementFromPoint(left + (right - left) * x, top + (bottom - top) * y);
+          return seen && (element.contains(seen) || seen.contains(element));
+        });
+        return isSeen ? '' : `${element.outerHTML} ${top}`;
+      });
+      if (name) covered.push(name);
+    }
+    assert.deepEqual(covered, [], `${size} at ${text} %`);
+    await close();
+  }
+});
+
+test('full screen is full of the movie', async () => {
+  const { page, close } = await open(recording.page, { size: [500, 900] });
+  await opened(page);
+  await ready(page);
+  await page.locator('#full-screen').click();
+  await page.waitForFunction(() => document.fullscreenElement);
+  await page.waitForFunction(() => document.getElementById('stage').offsetHeight > innerHeight * 0.6);
+  await close();
 });
 
 test('full screen has a scrubber', async () => {

@@ -192,6 +192,12 @@ export function drawn(page) {
   return page.evaluate(() => new Promise((done) => requestAnimationFrame(() => requestAnimationFrame(done))));
 }
 
+/// Makes the text that many per cent of its usual size.
+export async function enlarge(page, text) {
+  await page.evaluate((text) => (document.documentElement.style.fontSize = text === 100 ? '' : `${(16 * text) / 100}px`), text);
+  await drawn(page);
+}
+
 /// How many pixels of the overlay are about of that colour.
 export function coloured(page, colour) {
   return page.evaluate(([red, green, blue]) => {

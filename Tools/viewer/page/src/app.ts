@@ -36,6 +36,7 @@ import { placeIcons } from './ui/icons';
 import { setUpKeys } from './ui/keys';
 import { mark, measured } from './ui/marks';
 import type { Page } from './ui/page';
+import { setUpRoom } from './ui/room';
 import { saveBlob } from './ui/save';
 import { setUpSplitters } from './ui/splitter';
 import { setUpTabs, showTab } from './ui/tabs';
@@ -132,6 +133,7 @@ export class App implements Page {
     if (document.getElementById('zulm-recording')) this.decoder.prepare();
     placeIcons();
     setUpTabs(() => this.requestFrame());
+    setUpRoom();
     setUpSplitters();
     setUpDialogs();
     setUpDrop((files) => void this.opening.openFiles(files));

@@ -219,7 +219,8 @@ export class Stage {
     const text = captionText(parts);
     if (text === this.shownCaption) return;
     this.shownCaption = text;
-    this.caption.style.fontSize = `${Math.max(12 * uiScale(), Math.min(34, this.width * 0.024))}px`;
+    const least = Math.min(12 * uiScale(), this.width * 0.06); // large texts leave the picture in sight
+    this.caption.style.fontSize = `${Math.max(least, Math.min(34, this.width * 0.024))}px`;
     this.caption.hidden = parts.length === 0;
     this.caption.dataset.text = text;
     this.caption.replaceChildren(...parts.map(captionPart));
