@@ -44,6 +44,13 @@ if(ZULM_VIEWER AND CHROMIUM)
     DEPENDS viewer_test_packages zulm
     VERBATIM)
 
+  # Pictures of the whole page at every size, to be looked at.
+  add_custom_target(viewer_every_size
+    COMMAND ${CMAKE_COMMAND} -E env ${viewer_settings} ${NODE} ${viewer_tests}/screenshots.mjs --every
+      ${viewer_packages}/every-size
+    DEPENDS viewer_test_packages zulm
+    VERBATIM)
+
   # The table of figures of the documentation.
   add_custom_target(viewer_figures
     COMMAND ${CMAKE_COMMAND} -E env ${viewer_settings} ${NODE} ${viewer_tests}/figures.mjs
