@@ -2,7 +2,7 @@
 
 import { uiScale } from './scale';
 
-const textSize = 16; // pixels, where the scale is 1
+const textSize = 16; // pixels, at a scale of 1
 // Times the size of the text.
 const widths = { 'is-compact': 68.7, 'is-narrow': 47.45, 'is-close': 34, 'is-slim': 30, 'is-tiny': 16 };
 const heights = { 'is-low': 26, 'is-flat': 17 };
