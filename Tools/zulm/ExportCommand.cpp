@@ -13,6 +13,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <map>
 #include <memory>
 #include <optional>
 #include <string_view>
@@ -64,8 +65,11 @@ public:
         visitStoredFields<Kind>(typename Kind::Value{},
                                 [&types](const char* key, const auto& value) { types.add(key, value); });
         Json columns{{s_recordingColumn, "VARCHAR"}};
-        for (const std::string& key : tableKeys<Kind>())
-            columns[key] = key == s_furtherColumn ? "VARCHAR[]" : types.types_.value(key, "DOUBLE"); // or the time
+        for (const std::string& key : tableKeys<Kind>()) {
+            const auto type = types.types_.find(key);
+            const char* const number = type == types.types_.end() ? "DOUBLE" : type->second; // or the time
+            columns[key] = key == s_furtherColumn ? "VARCHAR[]" : number;
+        }
         return columns;
     }
 
@@ -78,7 +82,7 @@ private:
     void add(const char* key, const std::string&) { types_[key] = "VARCHAR"; }
     void add(const char* key, const CursorImage&) { types_[key] = "BLOB"; }
 
-    Json types_;
+    std::map<std::string, const char*> types_;
 };
 
 /// Reads the entries of one recording, and appends them to a data set if there is one.
