@@ -1,5 +1,6 @@
 #include "Reports/EntryFormat.h"
 #include "Reports/Text.h"
+#include "Tools/zulm/Checksum.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/Command.h"
@@ -39,21 +40,6 @@ struct ExportOptions {
     TableFormat format = TableFormat::CSV;
     std::uint64_t partMegabytes = 128;
     bool json = false;
-};
-
-/// A hash of bytes that come piece by piece (FNV-1a, 64 bits). It tells copies of a recording apart from changed ones;
-/// nobody is kept from making two recordings with the same one.
-class Checksum {
-public:
-    void add(std::string_view bytes) {
-        constexpr std::uint64_t prime = 0x100000001b3;
-        for (const char byte : bytes)
-            value_ = (value_ ^ static_cast<unsigned char>(byte)) * prime;
-    }
-    std::uint64_t value() const { return value_; }
-
-private:
-    std::uint64_t value_ = 0xcbf29ce484222325;
 };
 
 /// The types that DuckDB has for the columns of a kind.
