@@ -1,15 +1,18 @@
 """Compiles and runs the blocks of code in a page, for the tests.
 
-The word after the opening fence says whether a block is C++, shell or Python. If a block of the language `text` follows
-immediately, it is what the block must print. C++ without a `main` becomes the body of a function, after its includes.
+The word after the opening fence says whether a block is C++, shell, Python or JSON. If a block of the language `text`
+follows immediately, it is what the block must print. C++ without a `main` becomes the body of a function, after its includes.
 
     blocks.py cpp PAGE OUTPUT    writes a program that runs the block at the line that is its argument
     blocks.py cmake PAGE PREFIX COMPILER    builds a program with each block of CMake and the library in PREFIX
     blocks.py run PAGE PROGRAM ZULM PYTHONPATH VIEWER DUCKDB    runs every block in its own folder of recordings. Skips
         Python if PYTHONPATH is empty, `zulm view` if VIEWER is 0, and Parquet if DUCKDB, the folder of Node's modules,
         is empty. Blocks for Node are those that ask for DuckDB; other JavaScript is for browsers, and is not run
+
+A block of JSON is a document that `zulm render` reads; it is skipped if the renderer was not built.
 """
 
+import json
 import os
 import pathlib
 import re
@@ -20,8 +23,10 @@ import tempfile
 
 FENCE = re.compile(r"^```(\w*)\n(.*?)^```$", re.MULTILINE | re.DOTALL)
 ROOT = pathlib.Path(__file__).resolve().parents[2]
-TESTED = ("cpp", "sh", "python")
+TESTED = ("cpp", "sh", "python", "json")
 OTHERS = ("text", "cmake", "js")
+# The option of `zulm render` that reads a document of a schema.
+READ_BY_RENDERER = {"zulm.style": "--style", "zulm.zooms": "--zoom", "zulm.redactions": "--redact"}
 # 1 means that a file could not be read, 2 wrong usage. The other exit codes say what was found.
 FINE = (0, 3, 4)
 
@@ -126,7 +131,8 @@ def run_shell(block, folder, environment, has_viewer):
     printed = ""
     for command in shell_lines(block.code):
         script = command.split()[0]
-        if re.match(r"scripts/|cmake |ctest |zulm (record|cut) ", command) or re.search(r"\b(pip|venv)\b", command):  # other tests run these
+        run_elsewhere = r"scripts/|cmake |ctest |zulm (record|cut|render|guide) "
+        if re.match(run_elsewhere, command) or re.search(r"\b(pip|venv)\b", command):
             if script.startswith("scripts/") and not os.access(ROOT / script, os.X_OK):
                 return f"{script} is not a script", printed
             continue
@@ -143,6 +149,13 @@ def run_shell(block, folder, environment, has_viewer):
     return None, printed
 
 
+def run_json(block, folder, environment):
+    (folder / "block.json").write_text(block.code, encoding="utf-8")
+    option = READ_BY_RENDERER[json.loads(block.code)["schema"]]
+    return run_program(["zulm", "render", "--quiet", "Talk.mp4", "--frames", "stills", "--at", "1", option, "block.json"],
+                       folder, environment)
+
+
 def run_program(command, folder, environment):
     ended = subprocess.run(command, cwd=folder, env=environment, capture_output=True, text=True, timeout=120)
     complaint = f"ended with {ended.returncode}: {ended.stderr}" if ended.returncode or ended.stderr else None
@@ -157,6 +170,8 @@ def run(page, program, zulm, python_path, viewer, duckdb):
     for block in blocks_of(page):
         if block.language == "python" and not python_path or is_for_node(block) and not duckdb:
             continue
+        if block.language == "json" and not (pathlib.Path(zulm).parents[1] / "render/zulm-render").exists():
+            continue
         with tempfile.TemporaryDirectory() as folder:
             folder = pathlib.Path(folder)
             make_recordings(folder, zulm)
@@ -166,6 +181,8 @@ def run(page, program, zulm, python_path, viewer, duckdb):
                 complaint, printed = run_program(["/usr/bin/python3", "-c", block.code], folder, environment)
             elif block.language == "js":
                 complaint, printed = run_program(["node", "-e", block.code], folder, environment)
+            elif block.language == "json":
+                complaint, printed = run_json(block, folder, environment)
             else:
                 complaint, printed = run_shell(block, folder, environment, has_viewer)
         if complaint is None and block.printed is not None and printed != block.printed:

@@ -13,7 +13,7 @@
 namespace Render {
 
 /// A value, and where it stands.
-struct JsonField {
+struct JsonField {        // NOLINT(bugprone-exception-escape): documents of JSON do not throw when they move
     nlohmann::json value; ///< null for an object or an array
     std::size_t line = 1;
     std::size_t items = 0; ///< of an array

@@ -7,7 +7,6 @@
 
 extern "C" {
 #include <libavutil/channel_layout.h>
-#include <libswresample/swresample.h>
 }
 
 #include <algorithm>

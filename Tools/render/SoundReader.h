@@ -9,8 +9,9 @@
 #include <string>
 #include <vector>
 
-struct SwrContext;
-extern "C" void swr_free(SwrContext** context);
+extern "C" {
+#include <libswresample/swresample.h>
+}
 
 namespace Render {
 

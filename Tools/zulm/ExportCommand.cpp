@@ -1,5 +1,6 @@
 #include "Reports/EntryFormat.h"
 #include "Reports/Text.h"
+#include "Tools/zulm/Checksum.h"
 #include "Tools/zulm/Choice.h"
 #include "Tools/zulm/ChosenStreams.h"
 #include "Tools/zulm/Command.h"
@@ -13,6 +14,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <map>
 #include <memory>
 #include <optional>
 #include <string_view>
@@ -40,21 +42,6 @@ struct ExportOptions {
     bool json = false;
 };
 
-/// A hash of bytes that come piece by piece (FNV-1a, 64 bits). It tells copies of a recording apart from changed ones;
-/// nobody is kept from making two recordings with the same one.
-class Checksum {
-public:
-    void add(std::string_view bytes) {
-        constexpr std::uint64_t prime = 0x100000001b3;
-        for (const char byte : bytes)
-            value_ = (value_ ^ static_cast<unsigned char>(byte)) * prime;
-    }
-    std::uint64_t value() const { return value_; }
-
-private:
-    std::uint64_t value_ = 0xcbf29ce484222325;
-};
-
 /// The types that DuckDB has for the columns of a kind.
 class ColumnTypes {
 public:
@@ -64,8 +51,11 @@ public:
         visitStoredFields<Kind>(typename Kind::Value{},
                                 [&types](const char* key, const auto& value) { types.add(key, value); });
         Json columns{{s_recordingColumn, "VARCHAR"}};
-        for (const std::string& key : tableKeys<Kind>())
-            columns[key] = key == s_furtherColumn ? "VARCHAR[]" : types.types_.value(key, "DOUBLE"); // or the time
+        for (const std::string& key : tableKeys<Kind>()) {
+            const auto type = types.types_.find(key);
+            const char* const number = type == types.types_.end() ? "DOUBLE" : type->second; // or the time
+            columns[key] = key == s_furtherColumn ? "VARCHAR[]" : number;
+        }
         return columns;
     }
 
@@ -78,7 +68,7 @@ private:
     void add(const char* key, const std::string&) { types_[key] = "VARCHAR"; }
     void add(const char* key, const CursorImage&) { types_[key] = "BLOB"; }
 
-    Json types_;
+    std::map<std::string, const char*> types_;
 };
 
 /// Reads the entries of one recording, and appends them to a data set if there is one.

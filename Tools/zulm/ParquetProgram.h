@@ -17,7 +17,7 @@ public:
     explicit ParquetProgram(const std::string& folder);
 
     /// Lines of JSON, and what is in them.
-    struct Lines {
+    struct Lines { // NOLINT(bugprone-exception-escape): documents of JSON do not throw when they move
         std::string file;
         nlohmann::ordered_json columns; ///< names and DuckDB's types. Images are in base64
         std::uint64_t longest = 0;      ///< bytes of the longest line

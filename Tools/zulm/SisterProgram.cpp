@@ -63,6 +63,7 @@ ExitCode become(const SisterProgram& sister, const std::vector<std::string>& wor
         copies.emplace_back(sister.command);
     copies.insert(copies.end(), words.begin(), words.end());
     std::vector<char*> arguments;
+    arguments.reserve(copies.size() + 1);
     for (std::string& word : copies)
         arguments.push_back(word.data());
     arguments.push_back(nullptr);
