@@ -42,9 +42,10 @@ MOST_MORE_MEMORY = 32  # MiB, from 1,000 recordings to all of them
 missed = False
 
 
-def row(task, beside, figure, target, is_met):
+def row(task, beside, figure, target, is_met, is_near=False):
+    """A figure that is near its target is not met, and does not fail the run."""
     global missed
-    missed = missed or not is_met
+    missed = missed or not (is_met or is_near)
     print(f"| {task} | {beside} | {figure} | {target} | {'met' if is_met else '**missed**'} |", flush=True)
 
 
@@ -105,7 +106,7 @@ def compare_with_raw(folder):
     ratio = statistics.median(ratios)
     row(f"scan one kind of {len(paths):,} recordings, {size / len(places) / 1024:.0f} KiB each",
         "read(2) of the same bytes", f"{ratio:.2f}x ({per[0]:.1f} ns : {per[1]:.1f} ns)", f"{MOST_TIMES_RAW:.2f}x",
-        ratio <= MOST_TIMES_RAW * TOLERANCE)
+        ratio <= MOST_TIMES_RAW, ratio <= MOST_TIMES_RAW * TOLERANCE)
 
 
 def peak_of_this_process():
@@ -170,7 +171,8 @@ def report_growth(name, counts, measured):
         base = next(memory for count, (_, memory, _) in zip(counts, figures) if count >= SIDE_BY_SIDE or count == counts[-1])
         more = (figures[-1][1] - base) / MIB
         row(f"the same: memory of a worker from {SIDE_BY_SIDE:,} recordings to {counts[-1]:,}", "-",
-            f"{more:.3g} MiB", f"{MOST_MORE_MEMORY} MiB", more <= MOST_MORE_MEMORY * TOLERANCE)
+            f"{more:.3g} MiB", f"{MOST_MORE_MEMORY} MiB", more <= MOST_MORE_MEMORY,
+            more <= MOST_MORE_MEMORY * TOLERANCE)
 
 
 def table_of(counts, sizes, scans, exports):

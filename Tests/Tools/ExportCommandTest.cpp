@@ -8,9 +8,12 @@
 
 #include <algorithm>
 #include <chrono>
+#include <fcntl.h>
 #include <filesystem>
 #include <sstream>
+#include <sys/file.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 namespace ZULMetaData::Test {
 namespace {
@@ -175,11 +178,159 @@ TEST_F(ExportCommand, EndsACommitThatAnEarlierRunCouldNotEnd) {
     EXPECT_THAT(files(), ElementsAre("kind=cursorLocation/part-00000.csv", "manifest.ndjson"));
 }
 
+TEST_F(ExportCommand, LeavesACommitThatFailedToTheNextRun) {
+    ASSERT_EQ(exported({positions("first.dat", 1)}).exitCode, 0);
+    const std::string manifest = contentsOf(out + "/manifest.ndjson");
+    std::vector<std::string> arguments{"--part-size", "1"};
+    for (int i = 0; i < 12; ++i)
+        arguments.push_back(positions(std::to_string(i) + ".dat", 60000));
+    const int file = open((out + "/manifest.ndjson").c_str(), O_RDWR | O_CLOEXEC);
+    ASSERT_EQ(flock(file, LOCK_EX), 0); // keeps the tool from the manifest until it has tried to commit
+    ToolOptions options;
+    options.killAfterMilliseconds = 1;
+    options.killWhen = [this] { return std::filesystem::exists(out + "/.commit.json"); };
+    options.beforeKill = [file] { flock(file, LOCK_UN); };
+    options.killSignal = 0; // which disturbs nobody
+    std::vector<std::string> words{"export", "-o", out};
+    words.insert(words.end(), arguments.begin(), arguments.end());
+    const ToolResult result = runTool(words, options);
+    close(file);
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_EQ(std::count(result.errors.begin(), result.errors.end(), '\n'), 1) << result.errors;
+    EXPECT_EQ(contentsOf(out + "/manifest.ndjson"), manifest);
+    EXPECT_TRUE(std::filesystem::exists(out + "/.commit.json"));
+    EXPECT_EQ(exported(arguments).exitCode, 0);
+    std::vector<std::string> found = rows("cursorLocation");
+    EXPECT_EQ(found.size(), 720001U);
+    std::sort(found.begin(), found.end());
+    EXPECT_EQ(std::adjacent_find(found.begin(), found.end()), found.end());
+}
+
+TEST_F(ExportCommand, MovesNothingForADamagedCommit) {
+    const std::string file = positions("a.dat", 2);
+    ASSERT_EQ(exported({file}).exitCode, 0);
+    const auto manifest = contentsOf(out + "/manifest.ndjson");
+    std::filesystem::create_directory(folder / "victim");
+    writeFile(folder / "victim/.x", "mine");
+    const Json parts = Json::array({"kind=cursorLocation/part-00000.csv"});
+    const Json lines = Json::array({Json::parse(manifest.substr(manifest.find('\n')))});
+    const auto commit = [](const Json& bytes, const Json& names, const Json& recordings) {
+        return Json{{"manifest_bytes", bytes}, {"parts", names}, {"recordings", recordings}};
+    };
+    for (const Json& bad :
+         {commit(9, {"../victim/x"}, Json::array()),
+          commit(9, {"kind=cursorLocation/../../victim/part-0.csv"}, Json::array()),
+          commit(9, {"kind=cursorLocation/part-00000.csv.csv"}, Json::array()),
+          commit(9, {"kind=victim/part-00000.csv"}, Json::array()),
+          commit(9, {"kind=cursorLocation/part-.csv"}, Json::array()), commit(9, {7}, Json::array()),
+          commit(9, 7, Json::array()), commit(std::uint64_t{1} << 60, parts, lines), commit(-1, parts, lines),
+          commit("9", parts, lines), commit(9, parts, {"text"}), commit(9, parts, {Json{{"recording", 7}}}),
+          commit(9, parts, {Json::object()}), Json::array(), Json("text")}) {
+        writeFile(out + "/.commit.json", bad.dump());
+        const ToolResult result = exported({file});
+        EXPECT_EQ(result.exitCode, 1) << bad;
+        EXPECT_THAT(result.errors, HasSubstr(".commit.json: is damaged; export into a new folder")) << bad;
+        EXPECT_EQ(contentsOf(folder / "victim/.x"), "mine") << bad;
+        EXPECT_EQ(contentsOf(out + "/manifest.ndjson"), manifest) << bad;
+        EXPECT_FALSE(std::filesystem::exists(out + "/.writing")) << bad;
+    }
+}
+
+TEST_F(ExportCommand, RefusesAManifestWithALineThatIsTooLong) {
+    const std::string file = positions("a.dat", 2);
+    ASSERT_EQ(exported({file}).exitCode, 0);
+    std::filesystem::resize_file(out + "/manifest.ndjson", std::uint64_t{1} << 36); // a hole
+    const ToolResult result = exported({file});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("manifest.ndjson: line 3 is damaged; export into a new folder"));
+    EXPECT_LT(result.peakMemoryKB, 100'000);
+}
+
+TEST_F(ExportCommand, WritesThroughNoLink) {
+    const std::string file = positions("a.dat", 2);
+    ASSERT_EQ(exported({written("text.dat", streamHeader("2b7b6a06", 1, 0) + textEntry(1, "a"))}).exitCode, 0);
+    std::filesystem::create_directory(folder / "victim");
+    writeFile(folder / "victim/.part-00000.csv", "mine");
+    std::filesystem::create_symlink(folder / "victim", out + "/kind=cursorLocation");
+    const ToolResult result = exported({file});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("kind=cursorLocation: is a symbolic link; export into a new folder"));
+    EXPECT_EQ(contentsOf(folder / "victim/.part-00000.csv"), "mine");
+}
+
+TEST_F(ExportCommand, RefusesANameThatBelongsToAnotherRecording) {
+    std::filesystem::create_directory(folder / "A");
+    std::filesystem::create_directory(folder / "B");
+    positions("A/a.dat", 2);
+    positions("B/a.dat", 3);
+    ToolOptions options;
+    options.folder = folder / "A";
+    ASSERT_EQ(runTool({"export", "-o", out, "a.dat"}, options).exitCode, 0);
+    options.folder = folder / "B";
+    const ToolResult result = runTool({"export", "-o", out, "a.dat"}, options);
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("a.dat: is the name of " + (folder / "A/a.dat") + " in " + out +
+                                         "; name the recording by its absolute path"));
+    EXPECT_EQ(rows("cursorLocation").size(), 2U);
+    EXPECT_EQ(exported({folder / "B/a.dat"}).exitCode, 0);
+    EXPECT_EQ(rows("cursorLocation").size(), 5U);
+}
+
+TEST_F(ExportCommand, TakesALinkForItsTarget) {
+    const std::string file = positions("a.dat", 3);
+    std::filesystem::create_symlink(file, folder / "link.dat");
+    EXPECT_EQ(exported({file, folder / "link.dat"}).exitCode, 0);
+    EXPECT_EQ(exported({folder / "link.dat"}).exitCode, 0);
+    EXPECT_EQ(rows("cursorLocation").size(), 3U);
+}
+
+TEST_F(ExportCommand, SaysEveryTimeThatARecordingIsThereInPart) {
+    const std::string file = written("torn.dat", locations() + "1234");
+    EXPECT_EQ(exported({file}).exitCode, 3);
+    EXPECT_THAT(contentsOf(out + "/manifest.ndjson"), HasSubstr("\"is_whole\":false"));
+    for (int run = 0; run < 2; ++run) {
+        const ToolResult again = exported({file});
+        EXPECT_EQ(again.exitCode, 3);
+        EXPECT_THAT(again.errors, HasSubstr("torn.dat: is in the data set in part; repair the recording"));
+        std::filesystem::last_write_time(file, std::filesystem::last_write_time(file) + std::chrono::hours(1));
+    }
+    EXPECT_EQ(rows("cursorLocation").size(), 3U);
+}
+
+TEST_F(ExportCommand, LeavesNothingUnfinishedWhenItIsInterrupted) {
+    std::vector<std::string> arguments{"export", "-o", out};
+    for (int i = 0; i < 40; ++i)
+        arguments.push_back(positions(std::to_string(i) + ".dat", 20000));
+    ToolOptions options;
+    options.killAfterMilliseconds = 1;
+    options.killWhen = [this] { return std::filesystem::exists(out + "/kind=cursorLocation/.part-00000.csv"); };
+    const ToolResult result = runTool(arguments, options);
+    EXPECT_EQ(result.exitCode, 128 + 15);
+    EXPECT_THAT(result.errors, HasSubstr("Tables: interrupted; the same command goes on with what is not in it"));
+    EXPECT_THAT(files(), ElementsAre("manifest.ndjson"));
+}
+
+TEST_F(ExportCommand, IsInterruptedWhileItWaitsForNames) {
+    ToolOptions options;
+    options.keepsInputOpen = true;
+    options.killAfterMilliseconds = 1;
+    options.killWhen = [this] { return std::filesystem::exists(out + "/manifest.ndjson"); };
+    const ToolResult result = runTool({"export", "-o", out, "--jobs", "2", "--files-from", "-"}, options);
+    EXPECT_EQ(result.exitCode, 128 + 15);
+    EXPECT_THAT(files(), ElementsAre("manifest.ndjson"));
+}
+
+TEST_F(ExportCommand, TakesAKindThatIsNamedTwiceOnce) {
+    EXPECT_EQ(exported({"--stream", "cursorAction", movie()}).exitCode, 0);
+    EXPECT_EQ(exported({"--stream", "cursorAction", "--stream", "cursorAction", movie()}).exitCode, 0);
+}
+
 TEST_F(ExportCommand, RefusesAFolderOfOtherFilesAndAnotherFormat) {
     const std::string file = positions("a.dat", 2);
     std::filesystem::create_directory(out);
     writeFile(out + "/letter.txt", "mine");
     EXPECT_THAT(exported({file}).errors, HasSubstr("is a folder with other files in it; name a new one"));
+    EXPECT_THAT(files(), ElementsAre("letter.txt"));
     std::filesystem::remove(out + "/letter.txt");
     EXPECT_EQ(exported({file}).exitCode, 0);
     const ToolResult other = exported({"--format", "ndjson", file});
@@ -417,6 +568,7 @@ TEST_F(ExportParquet, SaysThatNodeIsMissing) {
     const ToolResult result = runTool({"export", "--format", "parquet", "-o", out, file}, options);
     EXPECT_EQ(result.exitCode, 1);
     EXPECT_THAT(result.errors, HasSubstr("node: no such program in PATH; install node"));
+    EXPECT_FALSE(std::filesystem::exists(out));
 }
 
 } // namespace

@@ -5,6 +5,8 @@
 #include "Reports/Text.h"
 #include "Tools/zulm/Failure.h"
 #include "Tools/zulm/OnFile.h"
+#include "Tools/zulm/OutputFile.h"
+#include "ZULMetaData/ZULMMetaDataUUIDs.h"
 
 #include <fmt/core.h>
 
@@ -12,7 +14,10 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <set>
+#include <stdexcept>
 #include <string_view>
+#include <utility>
 
 namespace Zulm {
 
@@ -22,19 +27,22 @@ namespace {
 
 constexpr auto s_manifestName = "manifest.ndjson";
 constexpr auto s_recordingKey = "recording";
-constexpr auto s_bytesKey = "recording_base64";
+constexpr auto s_nameKey = "name";
 constexpr auto s_journalName = ".commit.json";
 constexpr std::string_view s_partBegin = "part-";
+constexpr std::string_view s_folderBegin = "kind=";
+constexpr std::size_t s_longestLine = std::size_t{1} << 20; // of a manifest; paths are much shorter
 constexpr auto s_lockName = ".writing";
 constexpr std::uint64_t s_uncommittedParts = 16; // as many as may be lost when a run ends early
 
 std::string absolutePath(const std::string& path) {
-    return std::filesystem::absolute(path).lexically_normal().string();
+    return onFile(path, [&] { return std::filesystem::weakly_canonical(path).string(); });
 }
 
 std::string headerLine(const DataSet::Description& description) {
     std::vector<std::string> kinds = description.kinds;
     std::sort(kinds.begin(), kinds.end());
+    kinds.erase(std::unique(kinds.begin(), kinds.end()), kinds.end());
     return jsonLine(Json{
         {"schema", "zulm.data-set"}, {"schema_version", 1}, {"format", nameOf(description.format)}, {"kinds", kinds}});
 }
@@ -42,6 +50,7 @@ std::string headerLine(const DataSet::Description& description) {
 Json manifestLine(const std::string& path, const RecordingState& state) {
     Json line;
     addText(line, s_recordingKey, path);
+    addText(line, s_nameKey, state.name);
     line.update({{"bytes", state.size},
                  {"modified", state.modified},
                  {"checksum", fmt::format("{:016x}", state.checksum)},
@@ -49,10 +58,61 @@ Json manifestLine(const std::string& path, const RecordingState& state) {
     return line;
 }
 
+/// Returns the bytes of a text that `addText` has added. Throws what the document throws.
+std::string storedText(const Json& line, const std::string& key) {
+    const std::string bytesKey = key + "_base64";
+    return line.contains(bytesKey) ? bytesOfBase64(line.at(bytesKey).get<std::string>())
+                                   : line.at(key).get<std::string>();
+}
+
+/// Returns the path and what the manifest says. Throws what the document throws, and `std::logic_error`.
+std::pair<std::string, RecordingState> recordingOf(const Json& line) {
+    return {storedText(line, s_recordingKey),
+            {storedText(line, s_nameKey), line.at("bytes").get<std::uint64_t>(),
+             line.at("modified").get<std::int64_t>(), std::stoull(line.at("checksum").get<std::string>(), nullptr, 16),
+             line.at("is_whole").get<bool>()}};
+}
+
+/// Reads lines up to a length, so that a damaged file takes no memory.
+class Lines {
+public:
+    explicit Lines(const std::string& path) : path_(path), file_(path, std::ios::binary), buffer_(s_longestLine) {}
+
+    /// Returns nothing after the last one. Throws `Failure`.
+    std::optional<std::string_view> next() {
+        ++number_;
+        if (file_.getline(buffer_.data(), static_cast<std::streamsize>(buffer_.size())))
+            return std::string_view(buffer_.data(), static_cast<std::size_t>(file_.gcount()) - (file_.eof() ? 0 : 1));
+        if (file_.bad() || !file_.is_open())
+            throw Failure(fmt::format("{}: cannot be read", path_));
+        if (!file_.eof())
+            throwDamage();
+        return std::nullopt;
+    }
+
+    /// Throws `Failure` about the line that was read last.
+    [[noreturn]] void throwDamage() const {
+        throw Failure(fmt::format("{}: line {} is damaged; export into a new folder", path_, number_));
+    }
+
+private:
+    std::string path_;
+    std::ifstream file_;
+    std::vector<char> buffer_;
+    std::uint64_t number_ = 0;
+};
+
+/// Throws `Failure` if the folder of a kind is somewhere else.
+void requireNoLink(const std::string& folder) {
+    if (onFile(folder, [&] { return std::filesystem::is_symlink(folder); }))
+        throw Failure(fmt::format("{}: is a symbolic link; export into a new folder", folder));
+}
+
 } // namespace
 
 RecordingState RecordingState::of(const std::string& path) {
     RecordingState state;
+    state.name = path;
     try {
         state.size = std::filesystem::file_size(path);
         state.modified = std::filesystem::last_write_time(path).time_since_epoch().count();
@@ -64,15 +124,24 @@ RecordingState RecordingState::of(const std::string& path) {
 
 DataSet::DataSet(const std::string& folder, const Description& description)
     : folder_(folder), format_(description.format), partBytes_(description.partBytes) {
+    if (format_ == TableFormat::Parquet)
+        parquet_.emplace(folder_); // first, so that nothing is created without it
     createFolder(folder_);
     lock();
+    try {
+        open(description);
+    } catch (...) { // the folder may be another program's
+        lock_->remove();
+        throw;
+    }
+}
+
+void DataSet::open(const Description& description) {
     openManifest(description);
     if (std::filesystem::exists(pathOf(s_journalName)))
         apply(pathOf(s_journalName));
     readManifest();
     removeLeftovers();
-    if (format_ == TableFormat::Parquet)
-        parquet_.emplace(folder_);
 }
 
 DataSet::~DataSet() {
@@ -111,36 +180,28 @@ void DataSet::openManifest(const Description& description) {
             throw Failure(fmt::format("{}: is a folder with other files in it; name a new one", folder_));
         return replaceDurably(path, header + '\n');
     }
-    std::string found;
-    std::ifstream file(path, std::ios::binary);
-    if (!std::getline(file, found))
-        throw Failure(fmt::format("{}: cannot be read", path));
-    if (found != header)
+    if (Lines(path).next() != header)
         throw Failure(fmt::format("{}: has entries of another format or of other kinds; name a new folder", folder_));
 }
 
 void DataSet::readManifest() {
-    const std::string path = pathOf(s_manifestName);
-    std::ifstream file(path, std::ios::binary);
-    std::string text;
-    std::getline(file, text);
-    for (std::uint64_t number = 2; std::getline(file, text); ++number)
+    Lines lines(pathOf(s_manifestName));
+    lines.next(); // what the data set is
+    while (const auto line = lines.next())
         try {
-            const Json line = Json::parse(text);
-            const std::string& recording = line.at(line.contains(s_bytesKey) ? s_bytesKey : s_recordingKey);
-            manifest_[recording] = {line.at("bytes"), line.at("modified"),
-                                    std::stoull(line.at("checksum").get<std::string>(), nullptr, 16),
-                                    line.at("is_whole")};
-        } catch (const std::exception&) {
-            throw Failure(fmt::format("{}: line {} is damaged; export into a new folder", path, number));
+            const auto [path, state] = recordingOf(Json::parse(*line));
+            names_[state.name] = path;
+            manifest_[path] = state;
+        } catch (const Json::exception&) {
+            lines.throwDamage();
+        } catch (const std::logic_error&) {
+            lines.throwDamage();
         }
-    if (file.bad())
-        throw Failure(fmt::format("{}: cannot be read", path));
 }
 
 void DataSet::removeLeftovers() const {
     for (const auto& entry : std::filesystem::directory_iterator(folder_))
-        if (entry.is_directory() && entry.path().filename().string().starts_with("kind="))
+        if (entry.is_directory() && !entry.is_symlink() && entry.path().filename().string().starts_with(s_folderBegin))
             for (const auto& file : std::filesystem::directory_iterator(entry.path()))
                 if (isUnfinished(file.path().string()))
                     std::filesystem::remove(file.path());
@@ -151,15 +212,24 @@ bool DataSet::claim(const std::string& path) {
     return claimed_.insert(absolutePath(path)).second;
 }
 
+void DataSet::takeName(const std::string& path) {
+    const std::lock_guard lock(mutex_);
+    const std::string absolute = absolutePath(path);
+    const std::string& other = names_.try_emplace(path, absolute).first->second;
+    if (other != absolute)
+        throw Failure(
+            fmt::format("{}: is the name of {} in {}; name the recording by its absolute path", path, other, folder_));
+}
+
 std::optional<RecordingState> DataSet::stateOf(const std::string& path) const {
-    const Json name = manifestLine(absolutePath(path), {});
-    const auto found = manifest_.find(name.at(name.contains(s_bytesKey) ? s_bytesKey : s_recordingKey));
+    const auto found = manifest_.find(absolutePath(path));
     return found == manifest_.end() ? std::nullopt : std::optional(found->second);
 }
 
 std::unique_ptr<TablePart> DataSet::newPart(Table& table, const TableHead& head) {
-    const std::string folder = "kind=" + head.kind;
+    const std::string folder = std::string(s_folderBegin) + head.kind;
     if (!table.next) {
+        requireNoLink(pathOf(folder));
         createFolder(pathOf(folder));
         table.next = 0;
         for (const auto& file : std::filesystem::directory_iterator(pathOf(folder)))
@@ -179,8 +249,13 @@ std::shared_lock<std::shared_mutex> DataSet::beginRecording() {
 }
 
 void DataSet::requireUsable() const {
-    if (failure_)
-        std::rethrow_exception(failure_);
+    if (hasFailed_)
+        throw HasFailed();
+}
+
+bool DataSet::hasFailed() const {
+    const std::lock_guard lock(mutex_);
+    return hasFailed_;
 }
 
 void DataSet::append(const TableHead& head, const std::string& lines) {
@@ -189,7 +264,7 @@ void DataSet::append(const TableHead& head, const std::string& lines) {
     try {
         appendTo(tables_[head.kind], head, lines);
     } catch (...) {
-        failure_ = std::current_exception();
+        hasFailed_ = true;
         throw;
     }
 }
@@ -197,14 +272,17 @@ void DataSet::append(const TableHead& head, const std::string& lines) {
 void DataSet::appendTo(Table& table, const TableHead& head, const std::string& lines) {
     if (!table.open)
         table.open = newPart(table, head);
+    const std::uint64_t before = table.open->bytes();
     table.open->append(lines);
-    uncommittedBytes_ += lines.size();
+    uncommittedBytes_ += table.open->bytes() - before;
     if (table.open->bytes() >= partBytes_)
         endPart(table);
 }
 
 void DataSet::endPart(Table& table) {
+    const std::uint64_t before = table.open->bytes();
     table.open->end();
+    uncommittedBytes_ += table.open->bytes() - before;
     ended_.push_back(table.open->name());
     table.open.reset();
 }
@@ -235,6 +313,15 @@ void DataSet::commit() {
 void DataSet::commitAll() {
     const std::lock_guard lock(mutex_);
     requireUsable();
+    try {
+        commitUncommitted();
+    } catch (...) { // what is half committed must stay as it is for the next run
+        hasFailed_ = true;
+        throw;
+    }
+}
+
+void DataSet::commitUncommitted() {
     for (auto& [kind, table] : tables_)
         if (table.open)
             endPart(table);
@@ -267,23 +354,66 @@ void DataSet::moveIn(const std::string& part) const {
     });
 }
 
+/// Returns whether it is the name of a part that this program writes, and leads nowhere else.
+bool DataSet::isPartName(const std::string& part) const {
+    std::string_view rest = part;
+    const auto skip = [&rest](std::string_view begin) {
+        const bool isThere = rest.starts_with(begin);
+        rest.remove_prefix(isThere ? begin.size() : 0);
+        return isThere;
+    };
+    const std::size_t slash = rest.find('/');
+    if (slash == std::string_view::npos || !skip(s_folderBegin) ||
+        !ZULMetaData::findMetaDataKind(std::string(rest.substr(0, slash - s_folderBegin.size()))))
+        return false;
+    rest = std::string_view(part).substr(slash + 1);
+    if (!skip(s_partBegin))
+        return false;
+    const std::size_t digits = std::min(rest.find_first_not_of("0123456789"), rest.size());
+    return digits > 0 && rest.substr(digits) == "." + nameOf(format_);
+}
+
+/// A folder can come from anybody: nothing outside of it may change, whatever its files say.
+DataSet::Commit DataSet::readCommit(const std::string& journal) const {
+    Commit commit;
+    try {
+        std::ifstream file(journal, std::ios::binary);
+        const Json found = Json::parse(file);
+        commit.parts = found.at("parts").get<std::vector<std::string>>();
+        for (const Json& line : found.at("recordings")) {
+            const auto [path, state] = recordingOf(line);
+            commit.lines += jsonLine(manifestLine(path, state)) + '\n';
+        }
+        const Json& bytes = found.at("manifest_bytes");
+        commit.manifestBytes = bytes.get<std::uint64_t>();
+        if (bytes.is_number_unsigned() && commit.manifestBytes <= std::filesystem::file_size(pathOf(s_manifestName)) &&
+            std::all_of(commit.parts.begin(), commit.parts.end(),
+                        [this](const auto& part) { return isPartName(part); }))
+            return commit;
+    } catch (const Json::exception&) { // reported below
+    } catch (const std::logic_error&) {
+    }
+    throw Failure(fmt::format("{}: is damaged; export into a new folder", journal));
+}
+
 /// Can be repeated, so that the next run ends a commit that this one could not end.
 void DataSet::apply(const std::string& journal) {
-    std::ifstream file(journal, std::ios::binary);
-    const Json commit = Json::parse(file, nullptr, false);
-    if (!commit.is_object() || !commit.contains("manifest_bytes") || !commit.contains("parts") ||
-        !commit.contains("recordings"))
-        throw Failure(fmt::format("{}: is damaged; export into a new folder", journal));
-    for (const std::string part : commit.at("parts"))
+    const Commit commit = readCommit(journal);
+    std::set<std::string> folders;
+    for (const std::string& part : commit.parts)
+        folders.insert(std::filesystem::path(pathOf(part)).parent_path().string());
+    for (const std::string& folder : folders)
+        requireNoLink(folder);
+    for (const std::string& part : commit.parts)
         moveIn(part);
-    std::string lines;
-    for (const Json& recording : commit.at("recordings"))
-        lines += jsonLine(recording) + '\n';
+    for (const std::string& folder : folders)
+        syncByName(folder);
+    syncByName(folder_); // which may have new folders
     const std::string path = pathOf(s_manifestName);
     onFile(path, [&] {
         ZULMetaData::DurableFile manifest(path);
-        manifest.truncate(commit.at("manifest_bytes"));
-        manifest.writeAt(commit.at("manifest_bytes"), lines);
+        manifest.truncate(commit.manifestBytes);
+        manifest.writeAt(commit.manifestBytes, commit.lines);
         manifest.sync();
         std::filesystem::remove(journal);
     });

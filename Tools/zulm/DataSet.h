@@ -14,7 +14,6 @@
 #include "Tools/zulm/TablePart.h"
 
 #include <cstdint>
-#include <exception>
 #include <map>
 #include <memory>
 #include <mutex>
@@ -29,6 +28,7 @@ namespace Zulm {
 
 /// What a recording was when it was exported.
 struct RecordingState {
+    std::string name; ///< in its rows, as it was named first
     std::uint64_t size = 0;
     std::int64_t modified = 0; ///< as the file system's clock counts
     std::uint64_t checksum = 0;
@@ -57,29 +57,44 @@ public:
     /// Returns false if this run has begun the recording already, because it was named twice.
     bool claim(const std::string& path);
 
+    /// Gives the recording its name in the rows. Throws `Failure` if another one has it.
+    void takeName(const std::string& path);
+
     /// Returns what the manifest says about a recording.
     std::optional<RecordingState> stateOf(const std::string& path) const;
 
+    /// What is thrown after a failure of the data set that was thrown before: nothing is committed any more.
+    struct HasFailed {};
+
+    /// Returns whether an append or a commit has failed.
+    bool hasFailed() const;
+
     /// Keeps the data set from a commit while it lives, so that a recording is in one commit with all of its entries.
-    /// Throws `Failure` if an earlier append has failed, because nothing is committed then.
+    /// Throws `HasFailed`.
     std::shared_lock<std::shared_mutex> beginRecording();
 
-    /// Adds whole lines to the table of a kind. Throws `Failure`.
+    /// Adds whole lines to the table of a kind. Throws `Failure` and `HasFailed`.
     void append(const TableHead& head, const std::string& lines);
 
     /// Says that all lines of a recording were appended.
     void endRecording(const std::string& path, const RecordingState& state);
 
     /// Commits if so much was appended that it should not be lost. Nothing may be begun by this thread. Throws
-    /// `Failure`.
+    /// `Failure` and `HasFailed`.
     void commitIfDue();
 
-    /// Makes everything that was appended part of the data set. Throws `Failure`.
+    /// Makes everything that was appended part of the data set. Throws `Failure` and `HasFailed`.
     void commit();
 
     std::uint64_t parts() const { return parts_; } ///< the number of parts that were added
 
 private:
+    struct Commit {
+        std::uint64_t manifestBytes = 0; ///< before it
+        std::vector<std::string> parts;
+        std::string lines; ///< of the manifest
+    };
+
     struct Table {
         std::unique_ptr<TablePart> open;
         std::optional<std::uint64_t> next; ///< the number of the next part
@@ -87,6 +102,7 @@ private:
 
     std::string pathOf(const std::string& name) const;
     void lock();
+    void open(const Description& description);
     void openManifest(const Description& description);
     void readManifest();
     void removeLeftovers() const;
@@ -95,7 +111,10 @@ private:
     void requireUsable() const;
     void endPart(Table& table);
     void commitAll();
+    void commitUncommitted();
     void moveIn(const std::string& part) const;
+    bool isPartName(const std::string& part) const;
+    Commit readCommit(const std::string& journal) const;
     void apply(const std::string& journal);
 
     std::string folder_;
@@ -105,11 +124,12 @@ private:
     std::unique_ptr<ZULMetaData::LockFile> lock_;
     std::unordered_map<std::string, RecordingState> manifest_;
 
-    std::shared_mutex recordings_;            ///< shared by the recordings that are being exported
-    mutable std::mutex mutex_;                ///< guards what follows
-    std::exception_ptr failure_;              ///< of an append, which leaves out rows
-    FileAccess access_;                       ///< of the recordings that are not committed
-    std::unordered_set<std::string> claimed_; ///< the recordings of this run
+    std::shared_mutex recordings_;                       ///< shared by the recordings that are being exported
+    mutable std::mutex mutex_;                           ///< guards what follows
+    bool hasFailed_ = false;                             ///< an append, which leaves out rows, or a commit
+    FileAccess access_;                                  ///< of the recordings that are not committed
+    std::unordered_set<std::string> claimed_;            ///< the recordings of this run
+    std::unordered_map<std::string, std::string> names_; ///< from names in the rows to absolute paths
     std::map<std::string, Table> tables_;
     std::vector<std::string> ended_;           ///< names of parts that are whole and not committed
     std::vector<nlohmann::ordered_json> done_; ///< lines of the manifest that are not committed

@@ -6,6 +6,7 @@
 #include "Tools/zulm/Command.h"
 #include "Tools/zulm/DataSet.h"
 #include "Tools/zulm/InputFile.h"
+#include "Tools/zulm/Interruptions.h"
 #include "Tools/zulm/ManyFiles.h"
 #include "Tools/zulm/Settings.h"
 #include "Tools/zulm/StandardStreams.h"
@@ -149,6 +150,7 @@ private:
     }
 
     void pass(const TableHead& head, std::string& lines) {
+        NotedSignals::check();
         if (!lines.empty())
             dataSet_->append(head, lines);
         lines.clear();
@@ -167,9 +169,14 @@ public:
     Exporter(const ExportOptions& options, DataSet& dataSet) : options_(options), dataSet_(dataSet) {}
 
     ExitCode run(const std::string& path, RunReport& report) {
-        const ExitCode code = runOne(path, report);
-        dataSet_.commitIfDue();
-        return code;
+        try {
+            NotedSignals::check();
+            const ExitCode code = runOne(path, report);
+            dataSet_.commitIfDue();
+            return code;
+        } catch (const DataSet::HasFailed&) { // about which another recording complains
+            return ExitFailed;
+        }
     }
 
     std::uint64_t exported() const { return exported_; }
@@ -184,7 +191,9 @@ private:
         RecordingState state = RecordingState::of(path);
         const std::optional<RecordingState> known = dataSet_.stateOf(path);
         if (known && known->size == state.size && known->modified == state.modified)
-            return passOver(path, report);
+            return passOver(path, report, known->isWhole);
+        if (!known)
+            dataSet_.takeName(path);
         RecordingFile recording = openRecording(path);
         const std::vector<StreamInfo> streams = chosenStreams(recording, options_.kinds);
         if (known)
@@ -193,6 +202,7 @@ private:
         try {
             const ExitCode code = work.run(streams);
             state.checksum = work.checksum();
+            state.isWhole = code == ExitFine;
             dataSet_.endRecording(path, state);
             ++exported_;
             tell(report, path, "exported", work.entries());
@@ -204,11 +214,15 @@ private:
         }
     }
 
-    ExitCode passOver(const std::string& path, RunReport& report) {
-        say(fmt::format("{}: is in the data set", path));
+    ExitCode passOver(const std::string& path, RunReport& report, bool isWhole = true) {
+        if (isWhole)
+            say(fmt::format("{}: is in the data set", path));
+        else
+            complain(fmt::format("{}: is in the data set in part; repair the recording and export it into a new folder",
+                                 path));
         ++passedOver_;
         tell(report, path, "present", 0);
-        return ExitFine;
+        return isWhole ? ExitFine : ExitDamaged;
     }
 
     void tell(RunReport& report, const std::string& path, const char* state, std::uint64_t entries) const {
@@ -229,8 +243,10 @@ private:
         if (state.checksum != known.checksum)
             throw Failure(fmt::format("{}: has changed since it was exported to {}; export into a new folder",
                                       recording.name(), options_.folder));
+        state.name = known.name;
+        state.isWhole = known.isWhole;
         dataSet_.endRecording(recording.name(), state);
-        return passOver(recording.name(), report);
+        return passOver(recording.name(), report, state.isWhole);
     }
 
     const ExportOptions& options_;
@@ -243,15 +259,29 @@ ExitCode exportAll(const ExportOptions& options, RunReport& report) {
     std::vector<std::string> kinds;
     for (const std::string& kind : options.kinds)
         kinds.push_back(metaDataKindName(typeNamed(kind)));
+    const NotedSignals noted;
     DataSet dataSet(options.folder, {options.format, kinds, options.partMegabytes * s_megabyte});
     Exporter exporter(options, dataSet);
     const ExitCode code = workOnFiles(
-        options.files, report, [&](const std::string& path, RunReport& part) { return exporter.run(path, part); });
+        options.files, report, [&](const std::string& path, RunReport& part) { return exporter.run(path, part); },
+        [&dataSet](ExitCode) { return dataSet.hasFailed(); });
+    NotedSignals::check();
+    if (dataSet.hasFailed())
+        return code;
     dataSet.commit();
     if (!settings().quiet && !report.isWanted())
         writeOutput(fmt::format("{}: recordings exported: {}, already there: {}; new files: {}\n",
                                 shown(options.folder), exporter.exported(), exporter.passedOver(), dataSet.parts()));
     return code;
+}
+
+ExitCode exportOrEnd(const ExportOptions& options, RunReport& report) {
+    try {
+        return exportAll(options, report);
+    } catch (const Interruption& interruption) {
+        complain(fmt::format("{}: interrupted; the same command goes on with what is not in it", options.folder));
+        endBy(interruption);
+    }
 }
 
 void requireRecordings(const ManyFiles& files) {
@@ -286,7 +316,7 @@ void addExportCommand(CLI::App& app, Action& chosen) {
             throw CLI::ValidationError("--part-size", fmt::format("{} is not from {} to {}", options->partMegabytes,
                                                                   s_fewestMegabytes, s_mostMegabytes));
         chosen = reportingOnMany("export", options->json, options->files,
-                                 [options](RunReport& report) { return exportAll(*options, report); });
+                                 [options](RunReport& report) { return exportOrEnd(*options, report); });
     });
 }
 

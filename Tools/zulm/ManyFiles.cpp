@@ -1,6 +1,8 @@
 #include "Tools/zulm/ManyFiles.h"
 
+#include "Platform/Descriptor.h"
 #include "Tools/zulm/Choice.h"
+#include "Tools/zulm/Interruptions.h"
 #include "Tools/zulm/Progress.h"
 #include "Tools/zulm/StandardStreams.h"
 
@@ -10,18 +12,22 @@
 #include <atomic>
 #include <cerrno>
 #include <condition_variable>
-#include <cstdio>
 #include <cstring>
 #include <deque>
+#include <fcntl.h>
 #include <filesystem>
 #include <iostream>
 #include <mutex>
 #include <optional>
+#include <poll.h>
 #include <streambuf>
 #include <system_error>
 #include <thread>
+#include <unistd.h>
 
 namespace Zulm {
+
+using ZULMetaData::uninterrupted;
 
 namespace {
 
@@ -61,37 +67,18 @@ void requireFiles(const ManyFiles& files) {
                                    fmt::format("{} is too many; at most {} run at once", files.jobs, mostJobs));
 }
 
-/// The names in a file or on standard input.
+/// The names in a file or on standard input. While nothing comes, signals are looked for.
 class FileNames::List {
 public:
     List(const std::string& path, bool endsByZero)
-        : name_(path), end_(endsByZero ? '\0' : '\n'), file_(isDash(path) ? stdin : open(path)) {
+        : name_(path), end_(endsByZero ? '\0' : '\n'), file_(isDash(path) ? standardInput() : open(path)) {
         std::error_code isNoFile;
-        const auto size = file_ == stdin ? 0 : std::filesystem::file_size(path, isNoFile);
+        const auto size = isDash(path) ? 0 : std::filesystem::file_size(path, isNoFile);
         size_ = isNoFile ? 0 : size;
     }
 
-    ~List() {
-        std::free(line_);
-        if (file_ != stdin)
-            std::fclose(file_);
-    }
-
-    List(const List&) = delete;
-    List& operator=(const List&) = delete;
-
     bool next(std::string& path) {
-        for (;;) {
-            errno = 0;
-            const ssize_t got = getdelim(&line_, &capacity_, end_, file_);
-            if (got < 0 && (std::ferror(file_) || errno == ENOMEM))
-                throw Failure(fmt::format("{}: cannot be read: {}", name_, std::strerror(errno)));
-            if (got < 0)
-                return false;
-            read_ += static_cast<std::uint64_t>(got);
-            path.assign(line_, static_cast<std::size_t>(got));
-            if (path.back() == end_)
-                path.pop_back();
+        while (nextPiece(path)) {
             if (path.find('\0') != std::string::npos)
                 throw Failure(fmt::format("{}: the names in it end with zero bytes; add --null", name_));
             if (path.empty())
@@ -100,6 +87,7 @@ public:
                 path = "./-"; // a file of this name, as every other name in the list
             return true;
         }
+        return false;
     }
 
     /// Returns how much of the list is read, or nothing if nobody knows how long it is.
@@ -108,21 +96,69 @@ public:
     }
 
 private:
-    static std::FILE* open(const std::string& path) {
-        std::FILE* file = std::filesystem::is_directory(path) ? nullptr : std::fopen(path.c_str(), "rbe");
-        if (!file)
+    static int standardInput() { return fcntl(STDIN_FILENO, F_DUPFD_CLOEXEC, STDERR_FILENO + 1); }
+
+    static int open(const std::string& path) {
+        const bool isFolder = std::filesystem::is_directory(path);
+        const int file = isFolder ? -1 : uninterrupted([&] { return ::open(path.c_str(), O_RDONLY | O_CLOEXEC); });
+        if (file < 0)
             throw Failure(fmt::format("{}: the list of files cannot be opened: {}", path,
-                                      std::filesystem::is_directory(path) ? "it is a folder" : std::strerror(errno)));
+                                      isFolder ? "it is a folder" : std::strerror(errno)));
         return file;
+    }
+
+    /// Returns false after the last one.
+    bool nextPiece(std::string& piece) {
+        std::size_t end = bytes_.find(end_, begin_);
+        while (end == std::string::npos) {
+            const std::size_t searched = bytes_.size() - begin_;
+            if (!readMore())
+                break;
+            end = bytes_.find(end_, searched);
+        }
+        if (end == std::string::npos && begin_ == bytes_.size())
+            return false;
+        piece = bytes_.substr(begin_, end == std::string::npos ? end : end - begin_);
+        const std::size_t next = end == std::string::npos ? bytes_.size() : end + 1;
+        read_ += next - begin_;
+        begin_ = next;
+        return true;
+    }
+
+    /// Moves what is left to the beginning. Returns false at the end of the list.
+    bool readMore() {
+        constexpr std::size_t most = 65536;
+        bytes_.erase(0, begin_);
+        begin_ = 0;
+        if (isEnded_)
+            return false;
+        waitForBytes();
+        const std::size_t before = bytes_.size();
+        bytes_.resize(before + most);
+        const ssize_t got = uninterrupted([&] { return read(file_.number(), bytes_.data() + before, most); });
+        bytes_.resize(before + static_cast<std::size_t>(std::max<ssize_t>(got, 0)));
+        if (got < 0)
+            throw Failure(fmt::format("{}: cannot be read: {}", name_, std::strerror(errno)));
+        isEnded_ = got == 0;
+        return !isEnded_;
+    }
+
+    void waitForBytes() const {
+        constexpr int milliseconds = 100;
+        pollfd end{file_.number(), POLLIN, 0};
+        do
+            NotedSignals::check();
+        while (file_.isOpen() && poll(&end, 1, milliseconds) <= 0);
     }
 
     std::string name_;
     char end_;
-    std::FILE* file_;
+    ZULMetaData::Descriptor file_;
     std::uint64_t size_ = 0;
     std::uint64_t read_ = 0;
-    char* line_ = nullptr;
-    std::size_t capacity_ = 0;
+    std::string bytes_;     ///< what was read
+    std::size_t begin_ = 0; ///< where the next piece begins in it
+    bool isEnded_ = false;  ///< a terminal could go on
 };
 
 FileNames::FileNames(const ManyFiles& files)
@@ -408,11 +444,12 @@ ExitCode workOnFiles(FileNames& names, std::uint64_t jobs, RunReport& report, co
 }
 
 ExitCode workOnFiles(const ManyFiles& files, RunReport& report,
-                     const std::function<ExitCode(const std::string& file, RunReport& report)>& run) {
+                     const std::function<ExitCode(const std::string& file, RunReport& report)>& run,
+                     const std::function<bool(ExitCode)>& isEnough) {
     if (!files.areSeveral())
         return forEachFile(files.named, [&](const std::string& file) { return run(file, report); });
     FileNames names(files);
-    return workOnFiles(names, files.jobs, report, {.run = run});
+    return workOnFiles(names, files.jobs, report, {.run = run, .isEnough = isEnough});
 }
 
 Action reportingOnMany(const std::string& command, bool isWanted, const ManyFiles& files,

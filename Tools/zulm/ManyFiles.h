@@ -77,8 +77,10 @@ struct FileWork {
 ExitCode workOnFiles(FileNames& names, std::uint64_t jobs, RunReport& report, const FileWork& work);
 
 /// The same for the files of the command line. A single file is worked on in this thread, with a progress of its own.
-ExitCode workOnFiles(const ManyFiles& files, RunReport& report,
-                     const std::function<ExitCode(const std::string& file, RunReport& report)>& run);
+ExitCode workOnFiles(
+    const ManyFiles& files, RunReport& report,
+    const std::function<ExitCode(const std::string& file, RunReport& report)>& run,
+    const std::function<bool(ExitCode)>& isEnough = [](ExitCode) { return false; });
 
 /// Returns an action that runs `work` on the files as `reporting` does.
 Action reportingOnMany(const std::string& command, bool isWanted, const ManyFiles& files,

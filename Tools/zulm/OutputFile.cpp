@@ -54,12 +54,6 @@ std::unique_ptr<TemporaryFile> newTemporary(const fs::path& path) {
     }
 }
 
-void sync(const std::string& path) {
-    const Descriptor file(uninterrupted([&] { return open(path.c_str(), O_RDONLY | O_CLOEXEC); }));
-    if (!file.isOpen() || uninterrupted([&] { return fsync(file.number()); }) != 0)
-        throw Failure(failureText(path, "cannot be synced"));
-}
-
 } // namespace
 
 OutputFile::OutputFile(const std::string& path, const std::vector<std::string>& inputs, bool force)
@@ -99,12 +93,11 @@ void OutputFile::copyFrom(const std::string& source, std::uint64_t offset, std::
 }
 
 void OutputFile::commit() {
-    sync(temporaryPath());
+    syncByName(temporaryPath());
     access_->applyTo(temporaryPath()); // last: it may take the right to open the file
     putInPlace();
     temporary_->release();
-    const fs::path folder = fs::path(path_).parent_path();
-    sync(folder.empty() ? "." : folder.string());
+    syncFolderOf(path_);
 }
 
 void OutputFile::putInPlace() {
@@ -146,6 +139,17 @@ void requireOutputName(const std::string& output, Container::Type type, const st
     if (named == Container::Unknown && MetaDataParser::streamTypeOf(input) == type)
         warn(fmt::format("{}: programs that go by the name do not take it for a {}; one that ends in {} is safe",
                          output, containerName(type), extensionFor(type)));
+}
+
+void syncByName(const std::string& path) {
+    const Descriptor file(uninterrupted([&] { return open(path.c_str(), O_RDONLY | O_CLOEXEC); }));
+    if (!file.isOpen() || uninterrupted([&] { return fsync(file.number()); }) != 0)
+        throw Failure(failureText(path, "cannot be synced"));
+}
+
+void syncFolderOf(const std::string& path) {
+    const fs::path folder = fs::path(path).parent_path();
+    syncByName(folder.empty() ? "." : folder.string());
 }
 
 std::ifstream openInput(const std::string& path) {

@@ -63,6 +63,12 @@ void writePart(const InputFile& input, std::uint64_t offset, std::uint64_t size,
 /// that go by the name find no metadata in `output` though they did in `input`.
 void requireOutputName(const std::string& output, ZULMetaData::Container::Type type, const std::string& input);
 
+/// Returns when the bytes of a file, or the names in a folder, are on the disk. Throws `Failure`.
+void syncByName(const std::string& path);
+
+/// The same for the folder that the path is in, after a file was renamed to it.
+void syncFolderOf(const std::string& path);
+
 /// Throws `Failure`.
 std::ifstream openInput(const std::string& path);
 

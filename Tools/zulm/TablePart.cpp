@@ -4,6 +4,7 @@
 #include "Platform/NewFile.h"
 #include "Tools/zulm/Failure.h"
 #include "Tools/zulm/OnFile.h"
+#include "Tools/zulm/OutputFile.h"
 #include "Tools/zulm/ParquetProgram.h"
 
 #include <fmt/core.h>
@@ -158,7 +159,8 @@ std::unique_ptr<TablePart> newTablePart(const std::string& folder, const std::st
 }
 
 void replaceDurably(const std::string& path, const std::string& bytes) {
-    const std::string unfinished = path + s_unfinishedEnd;
+    const bool isHidden = fs::path(path).filename().string().starts_with('.');
+    const std::string unfinished = (isHidden ? path : hiddenName(path)) + s_unfinishedEnd;
     onFile(path, [&] {
         fs::remove(unfinished);
         LineFile file(unfinished);
@@ -166,6 +168,7 @@ void replaceDurably(const std::string& path, const std::string& bytes) {
         file.closeDurably();
         fs::rename(unfinished, path);
     });
+    syncFolderOf(path);
 }
 
 } // namespace Zulm
