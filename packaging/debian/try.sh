@@ -32,6 +32,7 @@ if has_package zulm-record; then
 fi
 if has_package zulm-render; then
     zulm render --help | grep -q -e --remove-idle
+    ls /usr/share/man/man1/zulm-render.1* >/dev/null
     if zulm render Movie.mp4 -o Film.mp4 2>refused.txt || [ $? -ne 1 ]; then
         echo "zulm render is not refused without pictures" >&2
         exit 1
