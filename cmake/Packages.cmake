@@ -24,6 +24,16 @@ set(CPACK_DEBIAN_PACKAGE_CONTROL_STRICT_PERMISSION ON)
 
 set(library libzulmetadata${ZULMETADATA_ABI_VERSION})
 set(same_version "${library} (= ${PROJECT_VERSION})")
+
+# Each follows the summary, which is the same for all.
+set(CPACK_DEBIAN_LIBRARY_DESCRIPTION "The libraries that programs are linked against")
+set(CPACK_DEBIAN_DEVELOPMENT_DESCRIPTION "What programs are compiled with")
+set(CPACK_DEBIAN_TOOLS_DESCRIPTION "The zulm tool, which looks into recordings and changes them")
+set(CPACK_DEBIAN_RECORDER_DESCRIPTION
+  "The recorder that 'zulm record' starts: picture and metadata of an X display")
+set(CPACK_DEBIAN_RENDERER_DESCRIPTION
+  "The renderer that 'zulm render' and 'zulm guide' start: films and guides of recordings")
+
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_NAME ${library})
 set(CPACK_DEBIAN_LIBRARY_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_DEVELOPMENT_PACKAGE_NAME libzulmetadata-dev)
@@ -43,11 +53,9 @@ set(CPACK_DEBIAN_RENDERER_PACKAGE_DEPENDS "${same_version}, zulm-tools (= ${PROJ
 set(CPACK_DEBIAN_RENDERER_PACKAGE_RECOMMENDS fonts-dejavu-core)
 
 include(CPack)
-cpack_add_component_group(LIBRARY DESCRIPTION "The libraries that programs are linked against")
-cpack_add_component_group(DEVELOPMENT DESCRIPTION "What programs are compiled with")
-cpack_add_component_group(TOOLS DESCRIPTION "The zulm tool, which looks into recordings and changes them")
-cpack_add_component_group(RECORDER DESCRIPTION "The recorder that 'zulm record' starts: picture and metadata of an X display")
-cpack_add_component_group(RENDERER DESCRIPTION "The renderer that 'zulm render' and 'zulm guide' start: films of recordings")
+foreach(group IN ITEMS LIBRARY DEVELOPMENT TOOLS RECORDER RENDERER)
+  cpack_add_component_group(${group} DESCRIPTION ${CPACK_DEBIAN_${group}_DESCRIPTION})
+endforeach()
 cpack_add_component(Core GROUP LIBRARY)
 cpack_add_component(Bridge GROUP LIBRARY)
 cpack_add_component(Session GROUP LIBRARY)
