@@ -255,6 +255,8 @@ void RecorderLoop::takeEvent(const xcb_generic_event_t& event) {
         observers_->windows.propertyChanged(reinterpret_cast<const xcb_property_notify_event_t&>(event));
     } else if (type == XCB_CONFIGURE_NOTIFY) {
         observers_->windows.configured(reinterpret_cast<const xcb_configure_notify_event_t&>(event));
+    } else if (type == XCB_FOCUS_IN || type == XCB_FOCUS_OUT) {
+        observers_->windows.focusChanged(reinterpret_cast<const xcb_focus_in_event_t&>(event));
     } else if (type == XCB_MAPPING_NOTIFY) {
         if (reinterpret_cast<const xcb_mapping_notify_event_t&>(event).request == XCB_MAPPING_POINTER)
             observers_->pointer.buttonsRemapped();
@@ -289,8 +291,16 @@ void RecorderLoop::takeKey(const xcb_input_raw_key_press_event_t& event) {
     constexpr std::uint32_t highestCode = 255;
     if (event.detail > highestCode)
         return;
-    const bool isFree = !freeKeys_ || (freeKeys_->has(event.detail, event.time) && observers_->windows.hasFocus());
-    observers_->keys.pressed(static_cast<std::uint8_t>(event.detail), event.time, !isFree);
+    const auto key = static_cast<std::uint8_t>(event.detail);
+    observers_->keys.pressed(key, event.time, isHidden(key, event.time));
+}
+
+/// A window manager that has grabbed one key has all of them until that one is released, such as those after Super.
+bool RecorderLoop::isHidden(std::uint8_t key, std::uint32_t serverTime) {
+    if (!freeKeys_)
+        return false;
+    const bool isGrabbed = !freeKeys_->has(key, serverTime); // has to be asked for every key, in their order
+    return (isGrabbed && !observers_->keys.isForManager(key)) || !observers_->windows.getsKeys();
 }
 
 /// Clicks call the key Command that keys call Windows.

@@ -149,9 +149,17 @@ class Window:
         self.process.stdin.buffer.write((line if isinstance(line, bytes) else line.encode()) + b"\n")
         self.process.stdin.buffer.flush()
 
+    def tell_and_wait(self, line, answer):
+        """Waits until the window says that the server has done it."""
+        before = len(self.lines(answer))
+        self.tell(line)
+        self.desk.wait_for(lambda: len(self.lines(answer)) > before)
+
     def grab_keyboard(self):
-        self.tell("grab")
-        self.desk.wait_for(lambda: self.lines("grabbed"))
+        self.tell_and_wait("grab", "grabbed")
+
+    def ungrab_keyboard(self):
+        self.tell_and_wait("ungrab", "ungrabbed")
 
 
 class Recording:
