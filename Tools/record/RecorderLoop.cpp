@@ -187,6 +187,7 @@ int RecorderLoop::run() {
 }
 
 void RecorderLoop::tellEnd(Outcome outcome) {
+    status_.end();
     if (!error_.empty())
         warn(error_);
     if (*end_ == End::Disk)
@@ -328,6 +329,7 @@ void RecorderLoop::began(Instant zero) {
     journal_->start(zero);
     sync_ = std::make_unique<DiskSync>(folder_.folder());
     journal_->note<CursorActionKind>(zero, s_noButtonYet);
+    journal_->session().flush(); // a recorder that is killed now has every stream that a recording begins with
     limitDuration();
     say("recording " + options_.output.string());
 }
@@ -369,6 +371,8 @@ void RecorderLoop::dropTrigger(Instant instant, bool isFromTerminal) {
 
 std::string RecorderLoop::obey(Command command) {
     const Instant instant = now();
+    if (end_)
+        return command == Command::Stop ? s_stopping : s_tooLate;
     switch (command) {
     case Command::Pause:
         if (!zero_)
@@ -384,11 +388,11 @@ std::string RecorderLoop::obey(Command command) {
     }
     dropTrigger(instant, false);
     end(End::Stop, instant);
-    return "stopping";
+    return s_stopping;
 }
 
 void RecorderLoop::pause(Instant instant) {
-    dropTrigger(instant, false);
+    takeEvents(); // those before the pause are in the recording
     pausedAt_ = instant;
     camera_->pause(instant);
     journal_->pause(instant);
