@@ -486,7 +486,8 @@ class Keys(Test):
             time.sleep(0.5)
             manager.tell_and_wait("grabkey 75", "grabbed")  # F9
             desk.xdotool("keydown", "F9", "key", "b", "keyup", "F9", "key", "c")
-            keys = [entry.value for entry in self.recorded(recording)["keyboardAction"]]
+            keys = [entry.value for entry in self.recorded(recording)["keyboardAction"]
+                    if entry.value[0] != 120]  # F9 itself may come before or after its grab
             self.assertEqual(keys, [(ord("X"), IS_VIRTUAL | SUPER), (37, IS_VIRTUAL | SUPER), (9, IS_VIRTUAL | ALT),
                                     (9, IS_VIRTUAL | ALT), (ord("c"), 0)])
 
