@@ -131,9 +131,13 @@ void AccessibilityProcess::take(const std::string& line, const AccessibilityEven
     }
 }
 
+/// What the pointer is over takes several questions, and no key waits for it.
 bool AccessibilityProcess::hangs() const {
-    const auto isLate = [](const std::optional<Instant>& asked) { return asked && now() > *asked + s_longestAnswer; };
-    return isLate(asked_) || isLate(askedHover_);
+    constexpr Instant longestHover = 3 * s_longestAnswer;
+    const auto isLate = [](const std::optional<Instant>& asked, Instant longest) {
+        return asked && now() > *asked + longest;
+    };
+    return isLate(asked_, s_longestAnswer) || isLate(askedHover_, longestHover);
 }
 
 void AccessibilityProcess::serve(const AccessibilityEvents& events) {

@@ -19,7 +19,8 @@ namespace Recorder {
 namespace {
 
 constexpr int s_callTimeout = 400;   ///< milliseconds of one call
-constexpr int s_deepest = 64;        ///< objects that are in each other
+constexpr int s_deepest = 64;        ///< objects that are in each other, from the outermost
+constexpr int s_farthest = 256;      ///< objects around a field
 constexpr int s_visitedAtMost = 600; ///< objects, in search of the focus
 
 struct ObjectDeleter {
@@ -76,7 +77,7 @@ const char* kindOf(AtspiAccessible* accessible) {
 /// Whether an object is in the window that the keys of its application go to.
 bool isInActiveWindow(AtspiAccessible* accessible) {
     Object<AtspiAccessible> object(static_cast<AtspiAccessible*>(g_object_ref(accessible)));
-    for (int depth = 0; object && depth < s_deepest; ++depth) {
+    for (int depth = 0; object && depth < s_farthest; ++depth) {
         if (hasState(object.get(), ATSPI_STATE_ACTIVE))
             return true;
         object.reset(atspi_accessible_get_parent(object.get(), nullptr));
@@ -191,10 +192,34 @@ Object<AtspiAccessible> Watcher::activeWindowOf(AtspiAccessible* application) {
     return nullptr;
 }
 
-/// Some documents have the state as well as the field in them, so the innermost object counts.
+/// Whether an object may have the focus as well as the field in it.
+bool isAroundFields(AtspiAccessible* accessible) {
+    switch (atspi_accessible_get_role(accessible, nullptr)) {
+    case ATSPI_ROLE_FRAME:
+    case ATSPI_ROLE_INTERNAL_FRAME:
+    case ATSPI_ROLE_WINDOW:
+    case ATSPI_ROLE_DIALOG:
+    case ATSPI_ROLE_DOCUMENT_FRAME:
+    case ATSPI_ROLE_DOCUMENT_WEB:
+    case ATSPI_ROLE_DOCUMENT_TEXT:
+    case ATSPI_ROLE_DOCUMENT_EMAIL:
+    case ATSPI_ROLE_DOCUMENT_SPREADSHEET:
+    case ATSPI_ROLE_DOCUMENT_PRESENTATION: return true;
+    default: return false;
+    }
+}
+
+/// Some documents have the state as well as the field in them, so the innermost object counts there. Any other object
+/// that has it is what keys go to, however many objects are in it.
 Object<AtspiAccessible> Watcher::focusIn(AtspiAccessible* accessible, int& visits) {
     if (++visits > s_visitedAtMost)
         return nullptr;
+    const auto itself = [accessible] {
+        return Object<AtspiAccessible>(static_cast<AtspiAccessible*>(g_object_ref(accessible)));
+    };
+    const bool hasFocus = hasState(accessible, ATSPI_STATE_FOCUSED);
+    if (hasFocus && !isAroundFields(accessible))
+        return itself();
     const int count = atspi_accessible_get_child_count(accessible, nullptr);
     for (int i = 0; i < count && visits <= s_visitedAtMost; ++i) {
         const Object<AtspiAccessible> child(atspi_accessible_get_child_at_index(accessible, i, nullptr));
@@ -203,8 +228,7 @@ Object<AtspiAccessible> Watcher::focusIn(AtspiAccessible* accessible, int& visit
         if (Object<AtspiAccessible> found = focusIn(child.get(), visits))
             return found;
     }
-    const bool hasFocus = visits <= s_visitedAtMost && hasState(accessible, ATSPI_STATE_FOCUSED);
-    return Object<AtspiAccessible>(hasFocus ? static_cast<AtspiAccessible*>(g_object_ref(accessible)) : nullptr);
+    return hasFocus && visits <= s_visitedAtMost ? itself() : nullptr;
 }
 
 /// Asks the application itself each time, so that its answer follows all events that it has sent before.

@@ -62,13 +62,29 @@ sockaddr_un addressOf(const fs::path& path) {
     return address;
 }
 
+/// Returns 0, or the number of the error.
+int connectTo(const FileHandle& handle, const fs::path& path) {
+    const sockaddr_un address = addressOf(path);
+    return connect(handle.get(), reinterpret_cast<const sockaddr*>(&address), sizeof(address)) == 0 ? 0 : errno;
+}
+
+FileHandle newSocket() {
+    return FileHandle(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
+}
+
 /// Returns a connection, or an empty handle if nobody listens.
 FileHandle connectionTo(const fs::path& path) {
-    FileHandle handle(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
-    const sockaddr_un address = addressOf(path);
-    if (connect(handle.get(), reinterpret_cast<const sockaddr*>(&address), sizeof(address)) != 0)
-        return {};
-    return handle;
+    FileHandle handle = newSocket();
+    return connectTo(handle, path) == 0 ? std::move(handle) : FileHandle();
+}
+
+/// Whether a recorder that was killed has left this socket. One that cannot be reached for another reason is in use.
+bool isAbandoned(const fs::path& path) {
+    std::error_code error;
+    if (fs::symlink_status(path, error).type() != fs::file_type::socket)
+        return false;
+    const FileHandle handle = newSocket();
+    return connectTo(handle, path) == ECONNREFUSED;
 }
 
 std::vector<fs::path> socketsOf(const fs::path& folder) {
@@ -103,8 +119,8 @@ ControlSocket::ControlSocket(const fs::path& path) : path_(path) {
         requireOwnFolder(folder);
         path_ = folder / fmt::format("{}{}{}", s_prefix, getpid(), s_suffix);
         unlink(path_.c_str()); // of an earlier process of this number
-    } else if (std::error_code error; fs::is_socket(path_, error) && !connectionTo(path_)) {
-        unlink(path_.c_str()); // of a recorder that was killed
+    } else if (isAbandoned(path_)) {
+        unlink(path_.c_str());
     }
     listener_ = FileHandle(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
     const sockaddr_un address = addressOf(path_);
@@ -195,6 +211,8 @@ int sendCommand(Command command, const fs::path& path) {
                         "of its folder",
                         target.string()),
             ExitLoss);
+    if (answers == s_tooLate + std::string("\n"))
+        throw Failure(fmt::format("{}: the recorder is ending; wait for its movie", target.string()));
     if (answers == s_tooEarly + std::string("\n"))
         throw Failure(fmt::format("{}: the recorder has no frame yet; say it again when it has", target.string()));
     if (answers.empty())

@@ -16,6 +16,12 @@ enum class Command { Pause, Resume, Stop };
 /// The answer to a command that comes before the first frame.
 inline constexpr const char* s_tooEarly = "too early";
 
+/// The answer to --pause and --resume after the end.
+inline constexpr const char* s_tooLate = "too late";
+
+/// The answer to --stop.
+inline constexpr const char* s_stopping = "stopping";
+
 /// The recorder's end. One thread uses it.
 class ControlSocket {
 public:

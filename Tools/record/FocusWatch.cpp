@@ -95,6 +95,7 @@ void FocusWatch::serve(bool hasWaitingKeys) {
                                              privacy_.setFocus(now(), focus);
                                      },
                                      [this](Instant asked, Focus focus) {
+                                         pause_ = s_firstPause; // the next outage is another one
                                          privacy_.setFocus(now(), focus);
                                          if (focus != Focus::Unknown)
                                              privacy_.confirm(asked);

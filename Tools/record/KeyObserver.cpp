@@ -174,6 +174,16 @@ void KeyObserver::pressed(std::uint8_t key, std::uint32_t serverTime, bool isHid
     repeated(key, serverTime);
 }
 
+bool KeyObserver::isForManager(std::uint8_t key) {
+    refresh();
+    if (!state_)
+        return false;
+    const xkb_keysym_t symbol = xkb_state_key_get_one_sym(state_.get(), key);
+    const Modifiers held = modifiers();
+    const Modifiers rest = characterOf(symbol) ? unconsumed(key, held, symbol) : held;
+    return rest.contains(Modifier::Windows) || (rest.contains(Modifier::Alt) && baseOf(key) == XKB_KEY_Tab);
+}
+
 void KeyObserver::repeated(std::uint8_t key, std::uint32_t serverTime) {
     refresh();
     if (hidden_[key] || !state_ || privacy_.mode() == KeyMode::Nothing)
@@ -221,12 +231,18 @@ std::optional<KeyObserver::Meaning> KeyObserver::keyOf(VirtualKey key, Modifiers
     return key != VirtualKey::Unknown ? std::optional(Meaning{storedKey(key, held), true}) : std::nullopt;
 }
 
-/// A key with Ctrl, Alt or Super is known by what it types without them.
-std::optional<KeyObserver::Meaning> KeyObserver::chord(xkb_keycode_t key, xkb_keysym_t symbol, Modifiers held) const {
+/// Returns the symbol of a key without modifiers, or `XKB_KEY_NoSymbol`.
+xkb_keysym_t KeyObserver::baseOf(xkb_keycode_t key) const {
     const xkb_layout_index_t group = xkb_state_key_get_layout(state_.get(), key);
     const xkb_keysym_t* symbols = nullptr;
     const int count = xkb_keymap_key_get_syms_by_level(keymap_.get(), key, group, 0, &symbols);
-    const xkb_keysym_t base = count > 0 ? symbols[0] : symbol;
+    return count > 0 ? symbols[0] : xkb_keysym_t{XKB_KEY_NoSymbol};
+}
+
+/// A key with Ctrl, Alt or Super is known by what it types without them.
+std::optional<KeyObserver::Meaning> KeyObserver::chord(xkb_keycode_t key, xkb_keysym_t symbol, Modifiers held) const {
+    const xkb_keysym_t own = baseOf(key);
+    const xkb_keysym_t base = own != XKB_KEY_NoSymbol ? own : symbol;
     const bool isKeypadDigit = symbol >= XKB_KEY_KP_0 && symbol <= XKB_KEY_KP_9;
     const char32_t character = characterOf(isKeypadDigit ? symbol : base);
     if (const std::uint32_t code = virtualKeyOfCharacter(character))

@@ -24,6 +24,10 @@ public:
     /// Takes a press. One that is hidden is not recorded, nor are its repetitions.
     void pressed(std::uint8_t key, std::uint32_t serverTime, bool isHidden);
 
+    /// Returns whether a window manager may be what has grabbed a press that comes now: it types nothing anywhere,
+    /// since it is a key with Super, or Alt and Tab.
+    bool isForManager(std::uint8_t key);
+
     /// Takes a repetition of a press.
     void repeated(std::uint8_t key, std::uint32_t serverTime);
 
@@ -51,6 +55,7 @@ private:
     void readKeyboard();
     void openCompose();
     std::optional<Meaning> meaningOf(xkb_keycode_t key);
+    xkb_keysym_t baseOf(xkb_keycode_t key) const;
     std::optional<Meaning> chord(xkb_keycode_t key, xkb_keysym_t symbol, ZULMetaData::Modifiers held) const;
     static std::optional<Meaning> keyOf(ZULMetaData::VirtualKey key, ZULMetaData::Modifiers held);
     bool isConsumed(xkb_keycode_t key, xkb_mod_index_t modifier) const;

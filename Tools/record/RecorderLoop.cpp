@@ -187,6 +187,7 @@ int RecorderLoop::run() {
 }
 
 void RecorderLoop::tellEnd(Outcome outcome) {
+    status_.end();
     if (!error_.empty())
         warn(error_);
     if (*end_ == End::Disk)
@@ -255,6 +256,8 @@ void RecorderLoop::takeEvent(const xcb_generic_event_t& event) {
         observers_->windows.propertyChanged(reinterpret_cast<const xcb_property_notify_event_t&>(event));
     } else if (type == XCB_CONFIGURE_NOTIFY) {
         observers_->windows.configured(reinterpret_cast<const xcb_configure_notify_event_t&>(event));
+    } else if (type == XCB_FOCUS_IN || type == XCB_FOCUS_OUT) {
+        observers_->windows.focusChanged(reinterpret_cast<const xcb_focus_in_event_t&>(event));
     } else if (type == XCB_MAPPING_NOTIFY) {
         if (reinterpret_cast<const xcb_mapping_notify_event_t&>(event).request == XCB_MAPPING_POINTER)
             observers_->pointer.buttonsRemapped();
@@ -289,8 +292,16 @@ void RecorderLoop::takeKey(const xcb_input_raw_key_press_event_t& event) {
     constexpr std::uint32_t highestCode = 255;
     if (event.detail > highestCode)
         return;
-    const bool isFree = !freeKeys_ || (freeKeys_->has(event.detail, event.time) && observers_->windows.hasFocus());
-    observers_->keys.pressed(static_cast<std::uint8_t>(event.detail), event.time, !isFree);
+    const auto key = static_cast<std::uint8_t>(event.detail);
+    observers_->keys.pressed(key, event.time, isHidden(key, event.time));
+}
+
+/// A window manager that has grabbed one key has all of them until that one is released, such as those after Super.
+bool RecorderLoop::isHidden(std::uint8_t key, std::uint32_t serverTime) {
+    if (!freeKeys_)
+        return false;
+    const bool isGrabbed = !freeKeys_->has(key, serverTime); // has to be asked for every key, in their order
+    return (isGrabbed && !observers_->keys.isForManager(key)) || !observers_->windows.getsKeys();
 }
 
 /// Clicks call the key Command that keys call Windows.
@@ -318,6 +329,7 @@ void RecorderLoop::began(Instant zero) {
     journal_->start(zero);
     sync_ = std::make_unique<DiskSync>(folder_.folder());
     journal_->note<CursorActionKind>(zero, s_noButtonYet);
+    journal_->session().flush(); // a recorder that is killed now has every stream that a recording begins with
     limitDuration();
     say("recording " + options_.output.string());
 }
@@ -359,6 +371,8 @@ void RecorderLoop::dropTrigger(Instant instant, bool isFromTerminal) {
 
 std::string RecorderLoop::obey(Command command) {
     const Instant instant = now();
+    if (end_)
+        return command == Command::Stop ? s_stopping : s_tooLate;
     switch (command) {
     case Command::Pause:
         if (!zero_)
@@ -374,11 +388,11 @@ std::string RecorderLoop::obey(Command command) {
     }
     dropTrigger(instant, false);
     end(End::Stop, instant);
-    return "stopping";
+    return s_stopping;
 }
 
 void RecorderLoop::pause(Instant instant) {
-    dropTrigger(instant, false);
+    takeEvents(); // those before the pause are in the recording
     pausedAt_ = instant;
     camera_->pause(instant);
     journal_->pause(instant);

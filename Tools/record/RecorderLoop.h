@@ -65,6 +65,7 @@ private:
     void takeEvent(const xcb_generic_event_t& event);
     void takeInput(const xcb_ge_generic_event_t& event);
     void takeKey(const xcb_input_raw_key_press_event_t& event);
+    bool isHidden(std::uint8_t key, std::uint32_t serverTime);
     ZULMetaData::Modifiers buttonModifiers() const;
     void takeMail();
     void takeSignals();

@@ -107,7 +107,7 @@ std::uint64_t RecordingFolder::freeBytes() const {
 }
 
 void RecordingFolder::publish() {
-    renameWithoutReplacing(movie(), output_);
+    renameWithoutReplacing(movie(), output_, fmt::format("the movie is whole in {}", movie().string()));
     syncFolder(output_.parent_path());
 }
 
@@ -135,15 +135,13 @@ bool removeRecording(const fs::path& folder) {
     return rmdir(folder.c_str()) == 0;
 }
 
-void renameWithoutReplacing(const fs::path& from, const fs::path& to) {
+void renameWithoutReplacing(const fs::path& from, const fs::path& to, const std::string& advice) {
     if (renameat2(AT_FDCWD, from.c_str(), AT_FDCWD, to.c_str(), RENAME_NOREPLACE) == 0)
         return;
     const bool isUnable = errno == EINVAL || errno == ENOSYS; // the file system
     if (isUnable && (renameByLink(from, to) || renameOverOwnFile(from, to)))
         return;
-    throw Failure(fmt::format("{}: cannot be made: {}; the movie is whole in {}", to.string(), std::strerror(errno),
-                              from.string()),
-                  ExitLoss);
+    throw Failure(fmt::format("{}: cannot be made: {}; {}", to.string(), std::strerror(errno), advice), ExitLoss);
 }
 
 void syncFolder(const fs::path& folder) {

@@ -55,8 +55,9 @@ std::vector<std::filesystem::path> streamFilesIn(const std::filesystem::path& fo
 /// folder is removed.
 bool removeRecording(const std::filesystem::path& folder);
 
-/// Renames a file unless there is one of the new name. Throws `Failure`.
-void renameWithoutReplacing(const std::filesystem::path& from, const std::filesystem::path& to);
+/// Renames a file unless there is one of the new name. Throws `Failure` with `advice` as the end of its sentence.
+void renameWithoutReplacing(const std::filesystem::path& from, const std::filesystem::path& to,
+                            const std::string& advice);
 
 /// Returns when the names in a folder are on the disk.
 void syncFolder(const std::filesystem::path& folder);

@@ -285,7 +285,7 @@ void makeMovie(const FileHandle& movie, const FragmentedMovie& fragments, const 
 void publish(const Draft& draft, const fs::path& output) {
     std::error_code error;
     if (!fs::exists(fs::symlink_status(output, error)))
-        renameWithoutReplacing(draft.path(), output);
+        renameWithoutReplacing(draft.path(), output, "name another place with -o");
     else if (!haveSameBytes(draft.path(), output))
         throw Refusal(fmt::format("{}: exists and is another movie; name another one with -o", output.string()));
     syncFolder(output.parent_path());

@@ -10,6 +10,7 @@
 
 #include <algorithm>
 #include <cstring>
+#include <utility>
 
 namespace Recorder {
 
@@ -150,10 +151,12 @@ const std::uint8_t* ScreenGrabber::fetch(xcb_drawable_t source, const Area& part
         return reply ? static_cast<const std::uint8_t*>(memory_) : nullptr;
     }
     const auto cookie = xcb_get_image(connection, XCB_IMAGE_FORMAT_Z_PIXMAP, source, x, y, width, height, s_allPlanes);
-    image_.reset(xcb_get_image_reply(connection, cookie, nullptr));
+    Reply<xcb_get_image_reply_t> image(xcb_get_image_reply(connection, cookie, nullptr));
     const auto needed = static_cast<std::int64_t>(bytesPerLineOf(part.width)) * part.height;
-    const bool isWhole = image_ && xcb_get_image_data_length(image_.get()) >= needed;
-    return isWhole ? xcb_get_image_data(image_.get()) : nullptr;
+    if (!image || xcb_get_image_data_length(image.get()) < needed)
+        return nullptr;
+    image_ = std::move(image);
+    return xcb_get_image_data(image_.get());
 }
 
 const std::uint8_t* ScreenGrabber::padded(const std::uint8_t* pixels, const Area& part) {
@@ -171,7 +174,7 @@ std::optional<GrabbedPicture> ScreenGrabber::grab() {
     }
     const xcb_drawable_t source = drawable();
     if (source == XCB_NONE)
-        return std::nullopt;
+        return repeatLast();
     Area part = area_;
     if (pixmapArea_)
         part = {0, 0, std::min(area_.width, pixmapArea_->width), std::min(area_.height, pixmapArea_->height)};
@@ -187,6 +190,18 @@ std::optional<GrabbedPicture> ScreenGrabber::grab() {
         return std::nullopt;
     if (part.width < area_.width || part.height < area_.height)
         picture.pixels = padded(picture.pixels, part);
+    lastPixels_ = picture.pixels;
+    return picture;
+}
+
+std::optional<GrabbedPicture> ScreenGrabber::repeatLast() {
+    if (!lastPixels_)
+        return std::nullopt;
+    std::optional<GrabbedPicture> picture = askPointer();
+    if (picture) {
+        picture->pixels = lastPixels_;
+        picture->bytesPerLine = bytesPerLine_;
+    }
     return picture;
 }
 

@@ -39,8 +39,8 @@ public:
 
     PixelLayout layout() const { return layout_; }
 
-    /// Takes a picture. Returns nothing if the area cannot be read now, such as a window that is hidden. A window that
-    /// became smaller has black at its right and below it.
+    /// Takes a picture. A window that is hidden shows its last picture, and one that became smaller has black at its
+    /// right and below it. Returns nothing if the area cannot be read now, such as a window that was never shown.
     std::optional<GrabbedPicture> grab();
 
     /// Asks for the pointer alone.
@@ -55,6 +55,7 @@ private:
     int bytesPerLineOf(int width) const;
     const std::uint8_t* fetch(xcb_drawable_t source, const Area& part);
     const std::uint8_t* padded(const std::uint8_t* pixels, const Area& part);
+    std::optional<GrabbedPicture> repeatLast();
     bool notePointer(xcb_query_pointer_cookie_t cookie, GrabbedPicture& picture);
 
     XConnection connection_;
@@ -68,8 +69,9 @@ private:
     int bytesPerLine_ = 0;
     xcb_shm_seg_t segment_ = 0;
     void* memory_ = nullptr;
-    Reply<xcb_get_image_reply_t> image_; ///< without shared memory
-    std::vector<std::uint8_t> padded_;   ///< a window that became smaller, and black around it
+    Reply<xcb_get_image_reply_t> image_;       ///< without shared memory
+    std::vector<std::uint8_t> padded_;         ///< a window that became smaller, and black around it
+    const std::uint8_t* lastPixels_ = nullptr; ///< those of the last picture, in one of the three places above
 };
 
 } // namespace Recorder

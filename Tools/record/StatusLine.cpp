@@ -41,9 +41,15 @@ void StatusLine::show(const Progress& progress) {
         progress.dropped, progress.entries, inMebibytes(progress.movieBytes), inMebibytes(progress.streamBytes)));
 }
 
-void StatusLine::say(const std::string& line) {
-    Recorder::say((isShown_ ? "\n" : "") + line);
+void StatusLine::end() {
+    if (isShown_)
+        Recorder::say("");
     isShown_ = false;
+}
+
+void StatusLine::say(const std::string& line) {
+    end();
+    Recorder::say(line);
 }
 
 } // namespace Recorder

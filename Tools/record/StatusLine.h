@@ -26,6 +26,9 @@ public:
 
     void show(const Progress& progress);
 
+    /// Leaves what is shown as it is. The next text begins a line.
+    void end();
+
     /// Writes a line of its own.
     void say(const std::string& line);
 

@@ -45,14 +45,19 @@ bool WindowObserver::isManaged() {
     return *isManaged_;
 }
 
-/// Keys go to the window below the pointer if the focus is on the root window.
-xcb_window_t WindowObserver::focusedWindow() const {
+xcb_window_t WindowObserver::inputFocus() const {
     const auto cookie = xcb_get_input_focus(connection_.get());
     const Reply<xcb_get_input_focus_reply_t> reply(xcb_get_input_focus_reply(connection_.get(), cookie, nullptr));
-    if (!reply || reply->focus == XCB_INPUT_FOCUS_NONE)
+    return reply ? reply->focus : xcb_window_t{XCB_INPUT_FOCUS_NONE};
+}
+
+/// Keys go to the window below the pointer if the focus is on the root window.
+xcb_window_t WindowObserver::focusedWindow() const {
+    const xcb_window_t focus = inputFocus();
+    if (focus == XCB_INPUT_FOCUS_NONE)
         return XCB_NONE;
-    if (reply->focus != XCB_INPUT_FOCUS_POINTER_ROOT && reply->focus != connection_.root())
-        return reply->focus;
+    if (focus != XCB_INPUT_FOCUS_POINTER_ROOT && focus != connection_.root())
+        return focus;
     const auto pointer = connection_.pointer();
     return pointer ? pointer->child : xcb_window_t{XCB_NONE};
 }
@@ -74,16 +79,31 @@ void WindowObserver::follow(Instant instant) {
 }
 
 /// Keys go to one window in the application's, or to the frame around it.
-bool WindowObserver::hasFocus() const {
-    if (client_ == XCB_NONE)
-        return true;
-    for (xcb_window_t window = focusedWindow(); window != XCB_NONE && window != connection_.root();) {
+bool WindowObserver::isInside(xcb_window_t window) const {
+    while (window != XCB_NONE && window != connection_.root()) {
         if (window == client_ || window == frame_ || window == active_)
             return true;
         const auto tree = connection_.treeOf(window);
         window = tree ? tree->parent : xcb_window_t{XCB_NONE};
     }
     return false;
+}
+
+/// A key may have closed its window, or opened another one, before anybody asks where the focus is. Its event comes
+/// before the one of the focus, which is why the events are asked first.
+bool WindowObserver::getsKeys() {
+    return client_ == XCB_NONE || isFocused_ || isInside(focusedWindow()) || activeWindow() != active_;
+}
+
+/// A grab sends such events, too, though the focus stays where it is. If the focus follows the pointer, no event tells
+/// when it enters a window.
+void WindowObserver::focusChanged(const xcb_focus_in_event_t& event) {
+    const bool isOfGrab = event.mode == XCB_NOTIFY_MODE_GRAB || event.mode == XCB_NOTIFY_MODE_UNGRAB;
+    const bool isOfPointer = event.detail >= XCB_NOTIFY_DETAIL_POINTER;
+    if (event.event != frame_ || isOfGrab || isOfPointer)
+        return;
+    const bool hasCome = (event.response_type & s_eventTypeBits) == XCB_FOCUS_IN;
+    isFocused_ = hasCome || event.detail == XCB_NOTIFY_DETAIL_INFERIOR;
 }
 
 /// Returns the window with the application's class: `window`, one around it, or one in it.
@@ -106,17 +126,33 @@ xcb_window_t WindowObserver::clientIn(xcb_window_t window) const {
     return child == end ? window : *child;
 }
 
+/// Finds the frame, which a window manager may put around the window later, and follows the focus into and out of it.
+void WindowObserver::watchFrame() {
+    const xcb_window_t frame = connection_.topLevelOf(client_);
+    if (frame == frame_)
+        return;
+    frame_ = frame;
+    if (frame_ != XCB_NONE && frame_ != client_) {
+        const std::uint32_t events = XCB_EVENT_MASK_STRUCTURE_NOTIFY | XCB_EVENT_MASK_FOCUS_CHANGE;
+        xcb_change_window_attributes(connection_.get(), frame_, XCB_CW_EVENT_MASK, &events);
+    }
+    isFocused_ = isInside(inputFocus());
+}
+
 void WindowObserver::readWindow(Instant instant) {
     const std::uint32_t itsEnd = XCB_EVENT_MASK_STRUCTURE_NOTIFY; // which may be that of the recording
-    if (client_ != XCB_NONE)
-        xcb_change_window_attributes(connection_.get(), client_, XCB_CW_EVENT_MASK, &itsEnd);
+    for (const xcb_window_t window : {client_, frame_})
+        if (window != XCB_NONE)
+            xcb_change_window_attributes(connection_.get(), window, XCB_CW_EVENT_MASK, &itsEnd);
     client_ = active_ == XCB_NONE ? xcb_window_t{XCB_NONE} : clientIn(active_);
     frame_ = XCB_NONE;
+    isFocused_ = false;
     process_ = 0;
     if (client_ != XCB_NONE) {
-        const std::uint32_t events = XCB_EVENT_MASK_PROPERTY_CHANGE | XCB_EVENT_MASK_STRUCTURE_NOTIFY;
+        const std::uint32_t events =
+            XCB_EVENT_MASK_PROPERTY_CHANGE | XCB_EVENT_MASK_STRUCTURE_NOTIFY | XCB_EVENT_MASK_FOCUS_CHANGE;
         xcb_change_window_attributes(connection_.get(), client_, XCB_CW_EVENT_MASK, &events);
-        frame_ = connection_.topLevelOf(client_);
+        watchFrame();
         const auto process = connection_.numbers(client_, processAtom_);
         process_ = process.empty() ? 0 : process.front();
     }
@@ -164,7 +200,7 @@ void WindowObserver::configured(const xcb_configure_notify_event_t& event) {
     if (event.window != frame_ && event.window != client_)
         return;
     if (event.window == client_) // a window manager may have put it into a frame
-        frame_ = connection_.topLevelOf(client_);
+        watchFrame();
     readArea(now());
 }
 
@@ -172,6 +208,7 @@ void WindowObserver::destroyed(xcb_window_t window) {
     if (window != client_ && window != frame_ && window != active_)
         return;
     client_ = frame_ = XCB_NONE;
+    isFocused_ = false;
     isFirst_ = true; // the next active window may have the same number
     follow(now());
 }

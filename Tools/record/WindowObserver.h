@@ -35,13 +35,20 @@ public:
 
     std::uint32_t process() const { return process_; }
 
-    /// Returns whether the window on top, if there is one, has the input focus now.
-    bool hasFocus() const;
+    /// Takes a change of the input focus.
+    void focusChanged(const xcb_focus_in_event_t& event);
+
+    /// Returns whether a key whose event comes next goes to the window on top, if there is one, or to one that the
+    /// window manager is about to name.
+    bool getsKeys();
 
 private:
     bool isManaged();
+    xcb_window_t inputFocus() const;
     xcb_window_t focusedWindow() const;
     xcb_window_t activeWindow();
+    bool isInside(xcb_window_t window) const;
+    void watchFrame();
     void follow(Instant instant);
     void readWindow(Instant instant);
     void readTexts(Instant instant);
@@ -62,6 +69,7 @@ private:
     xcb_window_t active_ = XCB_NONE; ///< as the window manager or the focus says
     xcb_window_t client_ = XCB_NONE; ///< the window of the application
     xcb_window_t frame_ = XCB_NONE;  ///< the child of the root window around it
+    bool isFocused_ = false;         ///< the focus is in `frame_`, as far as the events have told by now
     std::uint32_t process_ = 0;
     bool isFirst_ = true;
 };

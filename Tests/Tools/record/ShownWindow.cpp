@@ -4,8 +4,8 @@
 // pixels is drawn where the pointer is. What happens is printed, one line for each event, with its time on the clock of
 // the X server; "drawn COUNT TIME" says when the server had drawn a colour. Lines on standard input change the window:
 // "title TEXT", "class TEXT", "cursor NUMBER", "move X Y", "resize W H", "blank" (a cursor without pixels), "hide" and
-// "show" (the cursor, for all windows), "grab" and "ungrab" (the keyboard), "unmap" and
-// "map", "close".
+// "show" (the cursor, for all windows), "grab" and "ungrab" (the keyboard), "grabkey CODE"
+// (whatever is held with it, as window managers do), "unmap" and "map", "close", "mortal" (each key closes it).
 
 #include <xcb/xcb.h>
 #include <xcb/xfixes.h>
@@ -109,6 +109,7 @@ private:
         case XCB_KEY_PRESS: {
             const auto& press = as<xcb_key_press_event_t>(event);
             count("key", press.detail, press.time);
+            isOver_ = isMortal_;
             break;
         }
         case XCB_MOTION_NOTIFY: {
@@ -229,6 +230,25 @@ private:
         std::printf("grabbed %d\n", reply ? reply->status : -1);
     }
 
+    /// Waits until the server has done what it was asked for.
+    void tellDone(const char* what) {
+        const auto cookie = xcb_get_input_focus(connection_);
+        std::free(xcb_get_input_focus_reply(connection_, cookie, nullptr));
+        std::printf("%s\n", what);
+    }
+
+    void ungrabKeyboard() {
+        xcb_ungrab_keyboard(connection_, XCB_CURRENT_TIME);
+        tellDone("ungrabbed");
+    }
+
+    /// The server gives this client all keys from a press of that one until its release.
+    void grabKey(std::uint32_t code) {
+        xcb_grab_key(connection_, 0, screen_->root, XCB_MOD_MASK_ANY, static_cast<xcb_keycode_t>(code),
+                     XCB_GRAB_MODE_ASYNC, XCB_GRAB_MODE_ASYNC);
+        tellDone("grabbed");
+    }
+
     void readLine() {
         std::string line;
         if (!std::getline(std::cin, line)) {
@@ -258,7 +278,11 @@ private:
         else if (what == "grab")
             grabKeyboard();
         else if (what == "ungrab")
-            xcb_ungrab_keyboard(connection_, XCB_CURRENT_TIME);
+            ungrabKeyboard();
+        else if (what == "grabkey")
+            grabKey(two[0]);
+        else if (what == "mortal")
+            isMortal_ = true;
         else if (what == "unmap")
             xcb_unmap_window(connection_, window_);
         else if (what == "map")
@@ -285,6 +309,7 @@ private:
     std::size_t count_ = 0;
     bool isStale_ = true;
     bool isMoved_ = false;
+    bool isMortal_ = false;
     bool isOver_ = false;
 };
 

@@ -109,7 +109,7 @@ class Desk:
     def record(self, *options, name="out.mp4", wait=True):
         return Recording(self, self.folder / name, options, wait)
 
-    def record_with_bus(self, mode, name):
+    def record_with_bus(self, mode, name="out.mp4"):
         """The bus has to answer within 2 seconds, which a machine with other work to do may miss at first."""
         for _ in range(5):
             recording = self.record("--keys", mode, name=name)
@@ -149,9 +149,17 @@ class Window:
         self.process.stdin.buffer.write((line if isinstance(line, bytes) else line.encode()) + b"\n")
         self.process.stdin.buffer.flush()
 
+    def tell_and_wait(self, line, answer):
+        """Waits until the window says that the server has done it."""
+        before = len(self.lines(answer))
+        self.tell(line)
+        self.desk.wait_for(lambda: len(self.lines(answer)) > before)
+
     def grab_keyboard(self):
-        self.tell("grab")
-        self.desk.wait_for(lambda: self.lines("grabbed"))
+        self.tell_and_wait("grab", "grabbed")
+
+    def ungrab_keyboard(self):
+        self.tell_and_wait("ungrab", "ungrabbed")
 
 
 class Recording:
@@ -181,8 +189,9 @@ class Recording:
         return self.process.wait(60)
 
     def socket(self):
-        """Where the recorder listens, if it is the only one."""
-        return next(path for path in self.desk.folder.iterdir() if path.is_socket() and "zulm-record-" in path.name)
+        """Where the recorder listens, which is the only one."""
+        [only] = [path for path in self.desk.folder.iterdir() if path.is_socket() and "zulm-record-" in path.name]
+        return only
 
     def control(self, word):
         return self.desk.run(PROGRAMS["recorder"], word)
