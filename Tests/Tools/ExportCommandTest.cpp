@@ -312,6 +312,7 @@ TEST_F(ExportCommand, LeavesNothingUnfinishedWhenItIsInterrupted) {
 
 TEST_F(ExportCommand, IsInterruptedWhileItWaitsForNames) {
     ToolOptions options;
+    options.input = "\n"; // which is no name; without it the input ends at once
     options.keepsInputOpen = true;
     options.killAfterMilliseconds = 1;
     options.killWhen = [this] { return std::filesystem::exists(out + "/manifest.ndjson"); };

@@ -380,13 +380,15 @@ DataSet::Commit DataSet::readCommit(const std::string& journal) const {
         std::ifstream file(journal, std::ios::binary);
         const Json found = Json::parse(file);
         commit.parts = found.at("parts").get<std::vector<std::string>>();
-        for (const Json& line : found.at("recordings")) {
+        const Json& recordings = found.at("recordings");
+        for (const Json& line : recordings) {
             const auto [path, state] = recordingOf(line);
             commit.lines += jsonLine(manifestLine(path, state)) + '\n';
         }
         const Json& bytes = found.at("manifest_bytes");
         commit.manifestBytes = bytes.get<std::uint64_t>();
-        if (bytes.is_number_unsigned() && commit.manifestBytes <= std::filesystem::file_size(pathOf(s_manifestName)) &&
+        if (recordings.is_array() && bytes.is_number_unsigned() &&
+            commit.manifestBytes <= std::filesystem::file_size(pathOf(s_manifestName)) &&
             std::all_of(commit.parts.begin(), commit.parts.end(),
                         [this](const auto& part) { return isPartName(part); }))
             return commit;
