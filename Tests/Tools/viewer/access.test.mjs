@@ -205,13 +205,17 @@ test('full screen has a scrubber', async () => {
 test('while a recording loads nobody is asked for one', async () => {
   const before = () => {
     globalThis.Worker = class {
-      postMessage() {} // takes forever
+      postMessage({ type }) {
+        const reply = { id: 0, type: 'progress', part: 0.4 }; // and no other: it takes forever
+        if (type === 'open') setTimeout(() => this.onmessage({ data: reply }));
+      }
       terminate() {}
     };
   };
   const { page, close } = await open(recording.page, { before, size: [360, 740] });
   assert.equal(await page.locator('#welcome-title').innerText(), 'Opening Recording.mp4…');
   assert.ok(await page.locator('.welcome progress').isVisible());
+  await page.waitForFunction(() => document.getElementById('opening-progress').value === 0.4);
   assert.equal(await page.locator('#welcome-open').isVisible(), false);
   await close();
 });
@@ -229,6 +233,42 @@ test('heads of columns are whole', async () => {
     assert.deepEqual(cut, [], kind);
   }
   await close();
+});
+
+test('with large text on a small screen the facts are still read in words', async () => {
+  const { page, close } = await open(recording.page, { size: [360, 740] });
+  await opened(page);
+  await enlarge(page, 200);
+  await page.getByRole('tab', { name: 'Facts' }).click();
+  await waitUntil(() => page.locator('#pane-facts').innerText(), (text) => text.includes('Length'));
+  const broken = await page.evaluate(() => {
+    const words = [...document.querySelectorAll('.facts dd')].filter(({ textContent }) => textContent.length < 12);
+    const linesOf = (element) => {
+      const range = document.createRange();
+      range.selectNodeContents(element);
+      return new Set([...range.getClientRects()].map(({ top }) => Math.round(top))).size;
+    };
+    return words.filter((element) => linesOf(element) > 1).map(({ textContent }) => textContent);
+  });
+  assert.deepEqual(broken, []);
+  await close();
+});
+
+test('the entries beside the movie need no scrolling sideways', async () => {
+  for (const size of [
+    [1024, 768],
+    [1440, 900],
+  ]) {
+    const { page, close } = await open(recording.page, { size });
+    await opened(page);
+    await page.waitForFunction(() => document.querySelector('.entries-status').textContent.includes('entries'));
+    const { wide, room } = await page.evaluate(() => {
+      const { scrollWidth, clientWidth } = document.querySelector('.table');
+      return { wide: scrollWidth, room: clientWidth };
+    });
+    assert.ok(wide <= room, `${wide} pixels in ${room} at ${size[0]}`);
+    await close();
+  }
 });
 
 test('whoever wants less motion gets no trail', async () => {

@@ -65,6 +65,27 @@ test('a note stands at its time, in the list and in a lane, and in the next visi
   await close();
 });
 
+test('whoever writes notes that the browser does not keep is told once', async () => {
+  const before = () => {
+    const refuse = () => {
+      throw new Error('no storage');
+    };
+    Object.defineProperty(globalThis, 'localStorage', { get: refuse });
+  };
+  await opening({ before }, async (page) => {
+    await page.getByRole('tab', { name: 'Notes' }).click();
+    await note(page, 2, 'first');
+    await page.waitForFunction(() => document.getElementById('notice-text').textContent.includes('does not keep notes'));
+    await page.locator('#notice-close').click();
+    await note(page, 4, 'second');
+    assert.equal(await page.locator('#notice').isVisible(), false);
+    assert.deepEqual(await notes(page), [
+      ['0:02.000', 'first'],
+      ['0:04.000', 'second'],
+    ]);
+  });
+});
+
 test('notes belong to the recording, and move with it', async () => {
   const { page, close } = await open(recording.page, { hash: '#t=0&offset=-1.5' });
   await opened(page);

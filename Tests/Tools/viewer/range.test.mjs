@@ -74,6 +74,31 @@ test('dragging with Shift selects, in the lanes and in the ruler; edges can be m
     }
   }));
 
+test('the bar shows its selection in the lanes and lets it go; the menu and clicks with Shift select', () =>
+  shown(async (page) => {
+    const selectNothing = async () => {
+      await page.getByRole('button', { name: 'Select nothing' }).click();
+      await page.waitForFunction(() => zulmViewer.state().selection === null);
+    };
+    await select(page, 4, 8);
+    await page.getByRole('button', { name: 'Show in the lanes' }).click();
+    await page.waitForFunction(() => Math.abs(parseFloat(document.querySelector('.zoom-text').textContent) - 4) < 0.02);
+    await selectNothing();
+    await seek(page, 5);
+    await page.locator('#more-button').click();
+    await page.locator('#select-some').click();
+    await selected(page, 5, 6, 0.05);
+    for (const name of ['.lanes-body', '.ruler']) {
+      await selectNothing();
+      const { x, y, width, height } = await page.locator(name).boundingBox();
+      await page.keyboard.down('Shift');
+      await page.mouse.click(x + width * 0.75, y + Math.min(12, height / 2));
+      await page.keyboard.up('Shift');
+      await selected(page, 5, 7, 0.05);
+      assert.ok(Math.abs((await state(page)).time - 5) < 0.01, 'the playhead stays');
+    }
+  }));
+
 test('Shift with arrow keys selects in the timeline', () =>
   shown(async (page) => {
     await seek(page, 4);

@@ -2,7 +2,7 @@
 
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
-import { open, opened, recordedSession, seek, state } from './support.mjs';
+import { enlarge, open, opened, recordedSession, seek, state, waitUntil } from './support.mjs';
 
 const recording = recordedSession();
 
@@ -109,6 +109,26 @@ test('texts sort as people do, and all streams by their names', () =>
     await sorted(page, 1, 'descending');
     await page.waitForFunction(() => document.querySelector('.table-row').children[1].textContent === 'Topmost window title');
     assert.equal(await page.getByRole('button', { name: 'Sort by Entry' }).count(), 0);
+  }));
+
+/// The number of the first row that is whole, below the head.
+function firstRow(page) {
+  return page.evaluate(() => {
+    const { bottom } = document.querySelector('.table-head').getBoundingClientRect();
+    const rows = [...document.querySelectorAll('.table-row')].filter(({ hidden }) => !hidden);
+    const tops = rows.map((row) => ({ row: Number(row.dataset.row), top: row.getBoundingClientRect().top }));
+    return Math.min(...tops.filter(({ top }) => top > bottom - 1).map(({ row }) => row));
+  });
+}
+
+test('the table shows the same rows after the size of the text changes', () =>
+  withStream('cursorLocation', async (page) => {
+    await page.evaluate(() => (document.querySelector('.table').scrollTop = 100 * document.querySelector('.table-row').offsetHeight));
+    await waitUntil(() => firstRow(page), (row) => row === 100);
+    for (const text of [200, 100, 150]) {
+      await enlarge(page, text);
+      await waitUntil(() => firstRow(page), (row) => row === 100);
+    }
   }));
 
 test('cursors are shown in the table as they look', () =>

@@ -8,6 +8,7 @@ import { EntriesPane } from './entries/pane';
 import { showCheck, showFacts } from './facts/pane';
 import { InsightTables } from './insights/tables';
 import type { Range } from './lanes/axis';
+import type { Lane } from './lanes/lane';
 import { arrangeLanes } from './lanes/dialog';
 import { Timeline } from './lanes/timeline';
 import { clock, shown } from './model/format';
@@ -55,6 +56,7 @@ export class App implements Page {
   });
   readonly stage = new Stage(this.player, this.insights);
   private readonly opening = new Opening(this.decoder, {
+    lanesOf: (session) => this.timeline.lanesOf(session),
     onArrival: (arrival) => this.arrive(arrival),
     onProblem: (text) => this.complain(text),
   });
@@ -66,6 +68,8 @@ export class App implements Page {
   /// Counts the adjustments. The last one holds.
   private adjusted = 0;
   session: Session | undefined;
+  /// The lanes of a new recording come last: with all of the layout they would be one long task.
+  isShown = false;
   private isFramePending = false;
   private onlyTimeMoves = false;
   private shownMovie = '';
@@ -163,25 +167,26 @@ export class App implements Page {
   // What is open
 
   /// Nothing here waits: what was shown before stays whole until all of the new recording is there.
-  private arrive({ id, decoded, adjustment, session, movie, address, problems }: Arrival): void {
+  private arrive({ id, decoded, adjustment, session, lanes, movie, address, problems }: Arrival): void {
     this.movie.set(movie);
     if (address !== undefined) history.replaceState(null, '', address);
     [this.decoded, this.adjustment] = [decoded, adjustment];
     ++this.adjusted;
     this.decoder.keep(id); // what is drawn first may ask it
-    this.show(session);
+    this.show(session, lanes);
     if (problems.length > 0) this.complain(`Not everything could be read. ${problems.join('; ')}.`);
   }
 
-  private show(session: Session): void {
+  private show(session: Session, lanes: Lane[]): void {
     this.session = session;
+    this.isShown = false;
     document.body.classList.remove('is-empty');
     document.title = `${shown(session.name)} – ZULMetaData`;
     setText(byId('recording-name'), shown(session.name));
     this.loadMovie(session);
     this.notes.show(session, this.adjustment.offset);
     this.selection.start(this.player.duration);
-    this.showSession(session);
+    this.showSession(session, lanes);
     this.stage.zoom.reset();
     this.selectionChanged();
     void this.followLink();
@@ -192,6 +197,7 @@ export class App implements Page {
   }
 
   private firstPicture = (): void => {
+    this.isShown = true;
     this.frame();
     mark('zulm:first-picture');
   };
@@ -202,11 +208,11 @@ export class App implements Page {
     this.player.load(canHavePictures ? this.movie.url : null, session.duration, isGuessed);
   }
 
-  private showSession(session: Session): void {
+  private showSession(session: Session, lanes: Lane[]): void {
     this.session = session;
     this.insights.start(session.duration, this.adjustment.offset);
     this.stage.show(session);
-    this.timeline.show(session, this.player.duration);
+    this.timeline.show(session, lanes, this.player.duration);
   }
 
   /// Only what belongs to the adjustment changes. The movie goes on unless the reader chooses another one; null is the
@@ -217,6 +223,7 @@ export class App implements Page {
     if (!decoded || (isSame(adjustment, this.adjustment) && !hasOtherMovie)) return;
     const adjusted = ++this.adjusted;
     const session = await sessionOf(decoded, adjustment);
+    const lanes = await this.timeline.lanesOf(session);
     if (adjusted !== this.adjusted) return;
     this.adjustment = adjustment;
     if (movie) this.movie.replace(movie);
@@ -224,7 +231,8 @@ export class App implements Page {
     if (hasOtherMovie) this.loadMovie(session);
     else this.player.setLength(session.duration, session.movieDuration === undefined || this.movie.isAnother);
     const { zoomed } = this.timeline;
-    this.showSession(session);
+    this.showSession(session, lanes);
+    this.isShown = true;
     if (zoomed) this.timeline.setRange(zoomed);
     this.notes.setOffset(adjustment.offset);
     this.selection.setDuration(this.player.duration);
@@ -497,7 +505,7 @@ export class App implements Page {
       this.drawnTime = time;
       if (playing) this.timeline.reveal(time);
       this.stage.draw(time);
-      this.timeline.draw(time);
+      if (this.isShown) this.timeline.draw(time);
       this.controls.showTime(time, this.player.duration);
       this.entries.setTime(time);
     });

@@ -3,6 +3,7 @@
 import { adjustmentIn, shifted, type Adjustment } from './adjust/adjustment';
 import type { Decoder } from './decoder/client';
 import { embeddedRecording, type EmbeddedRecording, type PackedText } from './decoder/embedded';
+import type { Lane } from './lanes/lane';
 import { shown } from './model/format';
 import { joined, type Joined } from './model/joining';
 import { linkTo } from './model/link';
@@ -19,6 +20,7 @@ export interface Arrival {
   decoded: Decoded;
   adjustment: Adjustment;
   session: Session;
+  lanes: Lane[];
   movie: MovieFile;
   /// The new address of the page; undefined if the address stays.
   address: string | undefined;
@@ -33,6 +35,8 @@ export interface MovieFile {
 }
 
 export interface OpeningEvents {
+  /// Makes the lanes of a recording that comes.
+  lanesOf: (session: Session) => Promise<Lane[]>;
   /// Shows the recording. What was shown before is whole until then.
   onArrival: (arrival: Arrival) => void;
   onProblem: (text: string) => void;
@@ -124,10 +128,11 @@ export class Opening {
       const adjustment = adjustmentIn(coming.address ?? location.hash);
       const completed = coming.complete?.(decoded) ?? decoded;
       const session = await sessionOf(completed, adjustment);
+      const lanes = await this.events.lanesOf(session);
       if (await this.isOvertaken(number)) return this.giveUp(id);
       const { movie, address } = coming;
       this.lastShown = number;
-      this.events.onArrival({ id, decoded: completed, adjustment, session, movie, address, problems });
+      this.events.onArrival({ id, decoded: completed, adjustment, session, lanes, movie, address, problems });
       return true;
     } catch (error) {
       if (!(await this.isOvertaken(number))) this.events.onProblem(`${name} cannot be shown: ${wordsOf(error, name)}.`);

@@ -91,6 +91,17 @@ test('the cursor rests where nothing was recorded, and moves within the last usu
   ]);
 });
 
+test('entries at one time do not make the usual distance shorter, and an even number of distances has its mean', () => {
+  const moves = (time: number[]) => speedAlong(time, time.map((_, i) => 10 * i)).filter(([, speed]) => speed !== 0);
+  assert.deepEqual(moves([0, 0, 0, 0, 2, 4, 10, 10]).at(-1), [8, 5], 'the last of 2, 2 and 6 is a rest of 4 and a move of 2');
+  assert.deepEqual(moves([0, 1, 4, 9]), [
+    [0, 10],
+    [1, 3],
+    [4, 2],
+  ]); // 1, 3, 5: 3 is usual
+  assert.deepEqual(moves([0, 1, 2, 5, 14]).at(-1), [12, 5]); // 1, 1, 3, 9: 2 is usual
+});
+
 test('the synthetic hour has what a real one has', () => {
   const entries = new Map(syntheticEntries(3600).map((stream) => [stream.kind, stream]));
   assert.equal(entries.get('cursorLocation')!.time.length, 216000);

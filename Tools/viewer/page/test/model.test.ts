@@ -1,7 +1,7 @@
 import assert from 'node:assert/strict';
 import { test } from 'node:test';
 import type { Column, Entries, Table } from '#decoder';
-import { lanesOf } from '../src/lanes/lanes';
+import { withNotes } from '../src/lanes/lanes';
 import { appearancesIn } from '../src/model/appearances';
 import { clickLabel, clicksAround, clicksIn } from '../src/model/clicks';
 import { bytes, clock, plural, spokenTime, titleOf } from '../src/model/format';
@@ -147,7 +147,8 @@ test('idle times are what the library tells', () => {
 test('hidden characters of a note show themselves in its lane', () => {
   const notes = () => [{ time: 1, text: 'invoice\u202efdp.exe' }];
   const region = () => ({ x: 0, y: 0, width: 10, height: 10 });
-  const lane = lanesOf(session([]), { showsKeys: () => false, region, notes }).find(({ title }) => title === 'Notes');
+  const [lane] = withNotes([], session([]), { showsKeys: () => false, region, notes });
+  assert.equal(lane?.title, 'Notes');
   assert.equal(lane?.valueAt(1.2), 'invoice[U+202E]fdp.exe');
 });
 

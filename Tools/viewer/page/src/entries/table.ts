@@ -67,7 +67,9 @@ export class Table {
     this.scroller.addEventListener('keydown', (event) => this.press(event));
     this.space.addEventListener('click', (event) => this.click(event));
     this.space.addEventListener('pointerover', ({ target }) => showWhole(target as HTMLElement));
-    new ResizeObserver(() => this.resize()).observe(this.scroller);
+    const observer = new ResizeObserver(() => this.resize());
+    observer.observe(this.scroller);
+    observer.observe(this.head); // is as high as its text
   }
 
   show(rows: Rows): void {
@@ -92,7 +94,7 @@ export class Table {
     for (const element of this.pool) element.remove();
     this.pool = [];
     this.scroller.setAttribute('aria-colcount', String(rows.columns.length));
-    this.scrollTo(0);
+    this.top = 0;
     this.resize();
   }
 
@@ -118,7 +120,6 @@ export class Table {
     this.current = row >= 0 ? this.placeOf(row) : -1;
     this.place(-1, -1, false);
     this.resize();
-    this.scrollTo(this.top);
   }
 
   get shownCount(): number {
@@ -195,9 +196,11 @@ export class Table {
   }
 
   private resize(): void {
+    const { top, rowHeight } = this;
     this.rowHeight = rowLines * uiScale();
     this.space.style.height = `${Math.min(tallest, this.shownCount * this.rowHeight)}px`;
     this.scroller.setAttribute('aria-rowcount', String(this.shownCount + 1));
+    this.scrollTo((top / rowHeight) * this.rowHeight); // the first row stays
     this.refresh();
   }
 

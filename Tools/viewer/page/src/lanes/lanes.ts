@@ -10,6 +10,7 @@ import type { Note } from '../model/notes';
 import { countBefore, countUntil, lastAt } from '../model/search';
 import { rectAt, type HiddenStream, type Session } from '../model/session';
 import type { Track } from '../model/track';
+import { breath } from '../ui/breath';
 import { drawArea, drawBands, drawDensity, drawLine, type Curve, type Lane, type LaneCanvas } from './lane';
 
 export interface LaneOptions {
@@ -23,24 +24,31 @@ export interface LaneOptions {
 /// A lane before it is told from others of its name.
 type NamelessLane = Omit<Lane, 'id'>;
 
-export function lanesOf(session: Session, options: LaneOptions): Lane[] {
-  const lanes = [
-    notesLane(session, options),
-    slideLane(session),
-    textLane(session, 'topmostAppName', 'name', 'Application'),
-    textLane(session, 'topmostWindowTitle', 'title', 'Window'),
-    windowLane(session),
-    clickLane(session),
-    keyLane(session, options),
-    scrollLane(session),
-    speedLane(session),
-    trailLane(session, options),
-    hoverLane(session),
-    opacityLane(session),
-    cpuLane(session),
-    ...session.hidden.slice(0, mostHidden).map((hidden) => hiddenLane(hidden, options)),
+/// Returns all lanes but that of the notes, which `withNotes` adds. The page goes on meanwhile.
+export async function lanesOf(session: Session, options: LaneOptions): Promise<Lane[]> {
+  const makers = [
+    () => slideLane(session),
+    () => textLane(session, 'topmostAppName', 'name', 'Application'),
+    () => textLane(session, 'topmostWindowTitle', 'title', 'Window'),
+    () => windowLane(session),
+    () => clickLane(session),
+    () => keyLane(session, options),
+    () => scrollLane(session),
+    () => speedLane(session),
+    () => trailLane(session, options),
+    () => hoverLane(session),
+    () => opacityLane(session),
+    () => cpuLane(session),
+    ...session.hidden.slice(0, mostHidden).map((hidden) => () => hiddenLane(hidden, options)),
   ];
-  return identified(lanes.filter((lane): lane is NamelessLane => lane !== undefined));
+  const lanes: NamelessLane[] = [];
+  for (const make of makers) {
+    const lane = make();
+    if (!lane) continue;
+    lanes.push(lane);
+    await breath();
+  }
+  return identified(lanes);
 }
 
 /// Two hidden streams may have one name.
@@ -272,7 +280,7 @@ function drawKeys(canvas: LaneCanvas, track: Track, first: number, end: number):
   context.textBaseline = 'middle';
   for (let i = first; i < end; ++i) {
     const x = canvas.x(track.times[i]!);
-    const room = (i + 1 < end ? canvas.x(track.times[i + 1]!) : Infinity) - x;
+    const room = (i + 1 < end ? canvas.x(track.times[i + 1]!) : canvas.width) - x;
     const label = keyCap(track.text('label', i)).trim() || '␣';
     const width = Math.max(9, context.measureText(label).width + 6);
     context.fillStyle = accent;

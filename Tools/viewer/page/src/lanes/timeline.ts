@@ -124,10 +124,15 @@ export class Timeline {
     );
   }
 
-  show(session: Session, duration: number): void {
+  /// Makes the lanes that `show` takes. The page goes on meanwhile.
+  lanesOf(session: Session): Promise<Lane[]> {
+    return lanesOf(session, this.events);
+  }
+
+  show(session: Session, lanes: Lane[], duration: number): void {
     this.session = session;
     this.duration = duration;
-    this.lanes = lanesOf(session, this.events);
+    this.lanes = withNotes(lanes, session, this.events);
     this.placeLanes();
     this.overview.show(session, duration);
     this.ruler.setAttribute('aria-valuemax', duration.toFixed(3));

@@ -8,14 +8,43 @@ export interface Speed {
   values: Float32Array;
 }
 
-const sampled = 4096; // distances that the usual one is taken from
-
-/// The distance between two entries that half of all distances do not exceed; 0 if there is none.
+/// Returns the median of the distances between entries at different times, or 0 if there is none. It is that of the
+/// library, which says by it where the cursor is between two entries.
 function usualDistance(times: Float64Array): number {
-  const step = Math.max(1, Math.floor(times.length / sampled));
-  const distances: number[] = [];
-  for (let i = 1; i < times.length; i += step) distances.push(times[i]! - times[i - 1]!);
-  return distances.sort((a, b) => a - b)[distances.length >> 1] ?? 0;
+  const distances = new Float64Array(times.length);
+  let count = 0;
+  for (let i = 1; i < times.length; ++i) if (times[i]! > times[i - 1]!) distances[count++] = times[i]! - times[i - 1]!;
+  if (count === 0) return 0;
+  const all = distances.subarray(0, count);
+  const half = count >> 1;
+  const above = inOrder(all, half);
+  return count % 2 === 1 ? above : (greatest(all, half) + above) / 2;
+}
+
+/// Returns the value that has this place in ascending order, and moves all lesser ones before it.
+function inOrder(values: Float64Array, place: number): number {
+  let [low, high] = [0, values.length - 1];
+  while (low < high) {
+    const pivot = values[low + Math.floor(Math.random() * (high - low + 1))]!; // no file can choose a slow one
+    let [i, k] = [low, high];
+    while (i <= k) {
+      while (values[i]! < pivot) ++i;
+      while (values[k]! > pivot) --k;
+      if (i > k) break;
+      const value = values[i]!;
+      values[i++] = values[k]!;
+      values[k--] = value;
+    }
+    if (k < place) low = i;
+    if (i > place) high = k;
+  }
+  return values[place]!;
+}
+
+function greatest(values: Float64Array, count: number): number {
+  let most = -Infinity;
+  for (let i = 0; i < count; ++i) most = Math.max(most, values[i]!);
+  return most;
 }
 
 /// Positions that stay the same are not recorded: after more than twice the usual distance the cursor has rested, and

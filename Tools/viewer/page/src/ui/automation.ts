@@ -34,10 +34,10 @@ declare global {
   };
 }
 
-function stateOf({ session, player, stage, selection, finished }: Page): ViewerState {
+function stateOf({ session, isShown, player, stage, selection, finished }: Page): ViewerState {
   const position = session?.cursorAt(player.time);
   return {
-    isOpen: session !== undefined,
+    isOpen: isShown,
     finished,
     time: player.time,
     duration: player.duration,

@@ -14,6 +14,8 @@ export interface Page {
   /// Whether playing goes on after times in which nothing was done.
   skipsIdle: boolean;
   readonly session: Session | undefined;
+  /// Whether a recording is open and all of it was drawn.
+  readonly isShown: boolean;
   /// The number of files that were opened or refused.
   readonly finished: number;
   seek(time: number): void;
