@@ -6,6 +6,7 @@ import { test } from 'node:test';
 import { after, differencesOf, look, numberedRecording, settled, watch } from './numbered.mjs';
 import {
   longestTask,
+  longestTasks,
   longRecording,
   mostMemory,
   open,
@@ -72,6 +73,7 @@ test('figures', async () => {
 
 const megabytes = (bytes) => `${(bytes / 1e6).toFixed(0)} MB`;
 const milliseconds = (time) => `${time.toFixed(0)} ms`;
+const taskText = (time) => (time < 50 ? 'below 50 ms' : milliseconds(time));
 
 test('figures of eight hours', async () => {
   const recording = longRecording('Day', wholeDay);
@@ -81,7 +83,7 @@ test('figures of eight hours', async () => {
   const first = await page.evaluate(() => performance.getEntriesByName('zulm:first-picture')[0].startTime);
   await page.waitForFunction(() => document.querySelector('.entries-status').textContent.includes('entries'));
   await page.waitForTimeout(1000);
-  const opening = await longestTask(page);
+  const opening = await longestTasks(page);
   const word = await timeToFind(page, 'terminal');
   const digits = await timeToFind(page, '4321');
   const finding = await longestTask(page);
@@ -94,8 +96,9 @@ test('figures of eight hours', async () => {
     ['most memory until then', megabytes(memory * 1e6)],
     ['a word is found in', milliseconds(word)],
     ['digits are found in', milliseconds(digits)],
-    ['longest task while opening', opening < 50 ? 'below 50 ms' : milliseconds(opening)],
-    ['longest task while finding', finding < 50 ? 'below 50 ms' : milliseconds(finding)],
+    ['longest task while opening', taskText(opening.any)],
+    ['longest of them after the browser has read the page', taskText(opening.own)],
+    ['longest task while finding', taskText(finding)],
   ];
   process.stdout.write(lines.map((cells) => `| ${cells.join(' | ')} |\n`).join(''));
 });
