@@ -76,7 +76,7 @@ TEST(Style, HasOneColourIfNoOtherEndIsSaid) {
 TEST(Style, TellsTheLineAndTheMember) {
     EXPECT_EQ(refusal("\"cursor\": {\n  \"smooth\": true,\n  \"size\": 11\n}"),
               "my.json: line 4: \"cursor.size\" must be a number from 0.25 to 10");
-    EXPECT_EQ(refusal("\"cursor\": {\n\"sise\": 2}"), "my.json: line 3: \"cursor.sise\" is not known");
+    EXPECT_EQ(refusal("\"cursor\": {\n\"breadth\": 2}"), "my.json: line 3: \"cursor.breadth\" is not known");
     EXPECT_EQ(refusal("\"clicks\": []"), "my.json: line 2: \"clicks\" must be an object");
     EXPECT_EQ(refusal("\"clicks\": {\"show\": 1}"), "my.json: line 2: \"clicks.show\" must be true or false");
     EXPECT_EQ(refusal("\"keys\": {\"display\": \"some\"}"),
@@ -97,8 +97,8 @@ TEST(Style, RefusesColoursThatAreNone) {
 TEST(Style, IsOneThatShipsOrAFile) {
     EXPECT_EQ(styleOf("plain").frame.padding, 0);
     EXPECT_EQ(styleOf("product").frame.padding, 56);
-    EXPECT_EQ(failureOf([] { styleOf("produkt"); }),
-              "produkt: no style has this name; there are plain, product, and files whose names end in .json or have a "
+    EXPECT_EQ(failureOf([] { styleOf("fancy"); }),
+              "fancy: no style has this name; there are plain, product, and files whose names end in .json or have a "
               "slash");
     EXPECT_EQ(failureOf([] { styleOf("/no/such.json"); }),
               "/no/such.json: cannot be opened: No such file or directory");
