@@ -84,8 +84,6 @@ TEST(Manual, NamesEveryOptionOfEveryCommandInEveryForm) {
     const std::string zsh = generated("zsh");
     const std::string fish = generated("fish");
     for (const std::string& command : commands()) {
-        if (command == "render" || command == "guide")
-            continue; // their options are those of a program of its own, which may not be there
         EXPECT_THAT(man, HasSubstr(".SS " + command + "\n"));
         EXPECT_THAT(markdown, HasSubstr("\n### " + command + "\n"));
         EXPECT_THAT(zsh, HasSubstr("\n        " + command + ") _arguments"));
@@ -118,6 +116,18 @@ TEST(Manual, HasAPageOfTheRecorder) {
         EXPECT_THAT(std::regex_replace(page, std::regex("\\\\-"), "-"), HasSubstr("\\fB" + option + "\\fR"));
     writeFile(folder / "zulm-record.1", page);
     const ToolResult result = runProgram("groff", {"-man", "-Tutf8", "-ww", folder / "zulm-record.1"});
+    EXPECT_EQ(result.exitCode, 0);
+    EXPECT_EQ(result.errors, "");
+}
+
+TEST(Manual, HasAPageOfTheRenderer) {
+    TemporaryFolder folder;
+    const std::string page = generated("man-render");
+    for (const char* command : {"render", "guide"})
+        for (const std::string& option : optionsOf(command))
+            EXPECT_THAT(std::regex_replace(page, std::regex("\\\\-"), "-"), HasSubstr("\\fB" + option + "\\fR"));
+    writeFile(folder / "zulm-render.1", page);
+    const ToolResult result = runProgram("groff", {"-man", "-Tutf8", "-ww", folder / "zulm-render.1"});
     EXPECT_EQ(result.exitCode, 0);
     EXPECT_EQ(result.errors, "");
 }

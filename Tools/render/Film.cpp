@@ -1,6 +1,7 @@
 #include "Tools/render/Film.h"
 
 #include "Reports/Text.h"
+#include "Tools/render/FilmWriter.h"
 #include "Tools/render/Gif.h"
 #include "Tools/render/Production.h"
 #include "Tools/render/SoundTrack.h"
@@ -65,9 +66,13 @@ void sayTimes(const Composer& composer, double length) {
 }
 
 ExitCode renderFilm(const RenderOptions& options, Production& production, const EditList& edits) {
-    FilmWriter::requireCodec(options.film.codec);
+    FilmWriter::requireCodec(options.codec);
     Zulm::OutputFile output(options.output, inputsOf(options), options.force);
-    FilmSettings settings = options.film;
+    FilmSettings settings;
+    settings.fps = options.fps.value_or(settings.fps);
+    settings.codec = options.codec;
+    settings.quality = options.quality.value_or(settings.quality);
+    settings.isQualityAsked = options.quality.has_value();
     std::unique_ptr<SoundTrack> sound;
     if (!options.isSilent)
         sound = std::make_unique<SoundTrack>(production.path(), options.recording, edits);
@@ -96,7 +101,7 @@ ExitCode renderFilm(const RenderOptions& options, Production& production, const 
 }
 
 ExitCode renderGif(const RenderOptions& options, Production& production) {
-    const double fps = options.hasFps ? options.film.fps : s_gifFps;
+    const double fps = options.fps.value_or(s_gifFps);
     const FilmSize& size = production.size();
     const TimeMap& times = production.session().times();
     Zulm::OutputFile output(options.output, inputsOf(options), options.force);

@@ -85,7 +85,7 @@ public:
     }
     bool end_array() override { return close(); }
     bool key(string_t& name) override {
-        if (name.find_first_of(".[]") != string_t::npos) // would pass for the path of another member
+        if (name.empty() || name.find_first_of(".[]") != string_t::npos) // would pass for the path of another member
             throw Failure(fmt::format("{}: line {}: \"{}\" is not known", file_, line_, name));
         key_ = name;
         return true;

@@ -1,8 +1,8 @@
 #include "Tools/render/Options.h"
 
-#include "Tools/zulm/Settings.h"
+#include "Tools/render/ShippedStyles.h"
+#include "Tools/zulm/Choice.h"
 
-#include <CLI/CLI.hpp>
 #include <fmt/core.h>
 #include <fmt/ranges.h>
 
@@ -16,14 +16,7 @@ namespace {
 
 constexpr int s_largestSide = 8192;
 constexpr double s_mostGifFps = 50; ///< players show faster ones slower
-
-constexpr auto s_renderFooter =
-    R"(Cursor, clicks, keys and zooms are drawn from the metadata of the recording, which the film carries too.
-
-  zulm render Talk.mp4 -o Film.mp4
-  zulm render Talk.mp4 -o Film.mp4 --remove-idle --style plain --size 1280x720
-  zulm render Talk.mp4 -o Film.gif --gif --keep 10-14
-  zulm render Talk.mp4 --frames stills --at 1.5,12)";
+constexpr double s_longest = 1e7;   ///< seconds of a recording, and of a film
 
 FilmSize sizeOf(const std::string& text) {
     FilmSize size;
@@ -48,64 +41,106 @@ CLI::Validator numberFrom(double least, double most) {
                 const bool isFine = CLI::detail::lexical_cast(text, number) && number >= least && number <= most;
                 return isFine ? std::string() : fmt::format("{} is not a number from {} to {}", text, least, most);
             },
-            fmt::format("{} to {}", least, most)};
+            ""};
 }
 
-void addSourceOptions(CLI::App& app, SourceOptions& options) {
-    app.add_option("RECORDING", options.recording, "The recording; - is standard input")->required();
-    app.add_option("--style", options.style,
-                   fmt::format("A JSON file, or one of these: {}", fmt::join(shippedStyles(), ", ")))
-        ->type_name("STYLE");
-    app.add_option("--redact", options.redactions,
-                   "Cover the rectangles of this JSON file in the picture, and remove what lies there from the streams")
+/// Adds an option whose value is a time in seconds or a time code.
+template <class Seconds>
+CLI::Option* addSeconds(CLI::App& command, const std::string& name, Seconds& value, double least, double most,
+                        const std::string& description) {
+    const auto read = [name, &value, least, most](const std::string& word) {
+        const double seconds = Zulm::requireSeconds(name, word);
+        if (seconds < least || seconds > most)
+            throw CLI::ValidationError(name, fmt::format("{} is not from {} to {} seconds", word, least, most));
+        value = seconds;
+    };
+    return command.add_option_function<std::string>(name, read, description)->type_name("TIME");
+}
+
+void addSourceOptions(CLI::App& command, SourceOptions& options) {
+    command.add_option("RECORDING", options.recording, "The recording; - is standard input")->required();
+    command
+        .add_option("--style", options.style,
+                    fmt::format("How everything looks: a JSON file, or one of {}; product unless it is given",
+                                fmt::join(s_shippedStyles, ", ")))
         ->type_name("FILE");
-    app.add_option("--keys", options.keys, "Which keys are shown: shown, shortcuts or hidden")
-        ->check(CLI::IsMember({"shown", "shortcuts", "hidden"}));
-    app.add_option("--cursor-size", options.cursorSize, "How many times larger the cursor is drawn")
+    command
+        .add_option(
+            "--redact", options.redactions,
+            "Cover the rectangles of this JSON file in the picture, and remove what lies there from the streams")
+        ->type_name("FILE");
+    Zulm::addChoice<std::string>(
+        command, "--keys", options.keys,
+        "Which keys are shown; as the style says unless it is given. With shown, passwords that were typed are shown "
+        "too",
+        {{"shown", "shown"}, {"shortcuts", "shortcuts"}, {"hidden", "hidden"}});
+    command
+        .add_option("--cursor-size", options.cursorSize, "How many times larger the cursor is drawn, from 0.25 to 10")
+        ->type_name("N")
         ->check(numberFrom(0.25, 10));
-    app.add_flag("--raw-cursor", options.isRaw, "Move the cursor as it was recorded, and do not smooth its way");
-    app.add_option("--hide-cursor", options.hideAfter, "Hide a cursor that rests for so many seconds")
-        ->check(numberFrom(0.1, 3600));
-    app.add_option_function<std::string>(
-           "--size", [&options](const std::string& text) { options.size = sizeOf(text); },
-           "The size in pixels; that of the movie by default")
+    command.add_flag("--raw-cursor", options.isRaw, "Move the cursor as it was recorded, and do not smooth its way");
+    addSeconds(command, "--hide-cursor", options.hideAfter, 0.1, 3600, "Hide a cursor that has rested for this time");
+    command
+        .add_option_function<std::string>(
+            "--size", [&options](const std::string& text) { options.size = sizeOf(text); },
+            "The size in pixels; that of the movie unless it is given")
         ->type_name("WxH");
-    app.add_flag("--force", options.force, "Replace what exists");
-    app.add_flag("-q,--quiet", Zulm::settings().quiet, "Print nothing but errors");
-    app.add_flag("-v,--verbose", Zulm::settings().verbose, "Say what is done, and how long drawing takes");
-    app.add_flag("--no-progress", Zulm::settings().noProgress, "Show no progress");
-    app.set_version_flag("--version", ZULM_VERSION);
 }
 
-/// Returns false if the words asked for help alone.
-bool parse(CLI::App& app, std::vector<std::string> words) {
-    std::reverse(words.begin(), words.end()); // the parser takes them from the end
-    try {
-        app.parse(std::move(words));
-    } catch (const CLI::Success& shown) {
-        app.exit(shown);
-        return false;
-    }
-    return true;
+void addIdleOptions(CLI::App& command, RenderOptions& options) {
+    CLI::Option* idle =
+        command.add_flag("--remove-idle", options.removesIdle, "Cut long spans without activity to a rest")
+            ->excludes("--edits")
+            ->excludes("--keep")
+            ->excludes("--remove");
+    addSeconds(command, "--idle-least", options.idleLeast, 0.1, s_longest,
+               "How long such a span is at least; 5 unless it is given")
+        ->needs(idle);
+    addSeconds(command, "--idle-rest", options.idleRest, 0, s_longest,
+               "How much is left of such a span; 1 unless it is given")
+        ->needs(idle);
 }
 
-void requireSense(const RenderOptions& options) {
-    const int edits = (options.edits.file.empty() ? 0 : 1) + (options.edits.kept.empty() ? 0 : 1) +
-                      (options.edits.removed.empty() ? 0 : 1) + (options.removesIdle ? 1 : 0);
-    if (edits > 1)
-        throw CLI::ValidationError("--edits, --keep, --remove and --remove-idle cannot be given together");
-    if (options.frames.empty() != options.at.empty())
-        throw CLI::ValidationError("--frames DIR and --at T,T go together");
-    if (options.frames.empty() == options.output.empty())
-        throw CLI::ValidationError("give either -o OUT or --frames DIR");
-    if (options.isGif && !options.frames.empty())
-        throw CLI::ValidationError("--gif and --frames cannot be given together");
-    if (options.isGif && options.film.fps > s_mostGifFps)
-        throw CLI::ValidationError(
-            fmt::format("--fps {}: a GIF has at most {} frames a second", options.film.fps, s_mostGifFps));
-    const std::string extension = options.isGif ? ".gif" : ".mp4";
-    if (options.frames.empty() && !options.output.ends_with(extension))
-        throw CLI::ValidationError(fmt::format("{}: the name of the film must end in {}", options.output, extension));
+void addFilmOptions(CLI::App& command, RenderOptions& options) {
+    command
+        .add_option(
+            "--zoom", options.zoom,
+            "When the camera zooms in: auto, off, or a JSON file of zooms; as the style says unless it is given")
+        ->type_name("FILE");
+    command
+        .add_option("--fps", options.fps,
+                    "Frames a second, from 1 to 120; 30 unless it is given, and 12 with --gif, which takes up to 50")
+        ->type_name("N")
+        ->check(numberFrom(1, 120));
+    command.add_option("--codec", options.codec, "An encoder of libavcodec; h264 unless it is given")
+        ->type_name("NAME");
+    command.add_option("--quality", options.quality, "From 0, the best, to 51; 20 unless it is given")
+        ->type_name("N")
+        ->check(CLI::Range(0, 51).description(""));
+    command.add_flag("--no-sound", options.isSilent, "Leave the sound out");
+}
+
+void addKindOptions(CLI::App& command, RenderOptions& options) {
+    CLI::Option* gif = command.add_flag("--gif", options.isGif, "Make an animated GIF");
+    CLI::Option* frames =
+        command.add_option("--frames", options.frames, "Write single frames as PNG files into this folder")
+            ->type_name("DIR")
+            ->excludes(gif)
+            ->excludes("--output");
+    CLI::Option* at = command
+                          .add_option_function<std::vector<std::string>>(
+                              "--at",
+                              [&options](const std::vector<std::string>& words) {
+                                  options.at.clear();
+                                  for (const std::string& word : words)
+                                      options.at.push_back(Zulm::requireSeconds("--at", word));
+                              },
+                              "The times of these frames in the film")
+                          ->type_name("TIME,TIME")
+                          ->delimiter(',')
+                          ->allow_extra_args(false) // or it takes the recording
+                          ->needs(frames);
+    frames->needs(at);
 }
 
 } // namespace
@@ -128,50 +163,54 @@ std::vector<std::string> inputsOf(const RenderOptions& options) {
     return files;
 }
 
-std::optional<RenderOptions> renderOptionsOf(std::vector<std::string> words) {
-    RenderOptions options;
-    CLI::App app("Make a film of a recording, with its cursor, clicks and keys drawn into the picture", "zulm render");
-    app.footer(s_renderFooter);
-    addSourceOptions(app, options);
-    app.add_option("-o,--output", options.output, "The film to make")->type_name("OUT");
-    Zulm::addEditOptions(app, options.edits);
-    CLI::Option* idle = app.add_flag("--remove-idle", options.removesIdle, "Cut long spans without activity to a rest");
-    app.add_option("--idle-least", options.idleLeast, "How many seconds such a span has at least, 5 by default")
-        ->check(numberFrom(0.1, 1e6))
-        ->needs(idle);
-    app.add_option("--idle-rest", options.idleRest, "How many seconds are left of such a span, 1 by default")
-        ->check(numberFrom(0, 1e6))
-        ->needs(idle);
-    app.add_option("--zoom", options.zoom, "auto, off, or a JSON file of zooms")->type_name("auto|off|FILE");
-    CLI::Option* fps = app.add_option("--fps", options.film.fps, "Frames a second, 30 by default and 12 for --gif")
-                           ->check(numberFrom(1, 120));
-    app.add_option("--codec", options.film.codec, "An encoder of libavcodec, h264 by default");
-    CLI::Option* quality = app.add_option("--quality", options.film.quality, "From 0, the best, to 51; 20 by default")
-                               ->check(CLI::Range(0, 51));
-    app.add_flag("--no-sound", options.isSilent, "Leave the sound out");
-    app.add_flag("--gif", options.isGif, "Make an animated GIF");
-    app.add_option("--frames", options.frames, "Write single frames as PNG files into this folder")->type_name("DIR");
-    app.add_option("--at", options.at, "The times of these frames in seconds of the film")
-        ->type_name("T,T")
-        ->delimiter(',')
-        ->check(numberFrom(0, 1e7));
-    if (!parse(app, std::move(words)))
-        return std::nullopt;
-    options.hasFps = fps->count() > 0;
-    options.film.isQualityAsked = quality->count() > 0;
-    requireSense(options);
-    return options;
+CLI::App* addRenderOptions(CLI::App& app, RenderOptions& options) {
+    CLI::App* command = app.add_subcommand(
+        "render", "Make a film of a recording. The cursor, clicks, keys and zooms are drawn into its pictures from the "
+                  "metadata, which the film carries too");
+    addSourceOptions(*command, options);
+    command
+        ->add_option("-o,--output", options.output, "The film to make, whose name ends in .mp4, or in .gif with --gif")
+        ->type_name("OUT");
+    command->add_flag("--force", options.force, "Replace OUT, or the frames in DIR, if they exist");
+    Zulm::addEditOptions(*command, options.edits);
+    addIdleOptions(*command, options);
+    addFilmOptions(*command, options);
+    addKindOptions(*command, options);
+    command->footer("zulm render Talk.mp4 -o Film.mp4\n"
+                    "zulm render Talk.mp4 -o Film.mp4 --remove-idle --style plain --size 1280x720\n"
+                    "zulm render Talk.mp4 -o Film.gif --gif --keep 10-14\n"
+                    "zulm render Talk.mp4 --frames stills --at 1.5,12");
+    return command;
 }
 
-std::optional<GuideOptions> guideOptionsOf(std::vector<std::string> words) {
-    GuideOptions options;
-    CLI::App app("Make a guide of a recording: a step for each click, with a picture and words", "zulm guide");
-    app.footer("  zulm guide Talk.mp4 -o guide");
-    addSourceOptions(app, options);
-    app.add_option("-o,--output", options.folder, "The folder to make")->type_name("DIR")->required();
-    if (!parse(app, std::move(words)))
-        return std::nullopt;
-    return options;
+CLI::App* addGuideOptions(CLI::App& app, GuideOptions& options) {
+    CLI::App* command = app.add_subcommand(
+        "guide", "Make a guide of a recording: a folder with a step for each click and for the keys, "
+                 "each with a picture and words, as HTML and Markdown");
+    addSourceOptions(*command, options);
+    command->add_option("-o,--output", options.folder, "The folder to make")->type_name("DIR")->required();
+    command->add_flag("--force", options.force, "Replace the guide in DIR if there is one");
+    command->footer("zulm guide Talk.mp4 -o guide");
+    return command;
+}
+
+void requireSense(const RenderOptions& options) {
+    const Zulm::EditOptions& edits = options.edits;
+    if (!edits.file.empty() || !edits.kept.empty() || !edits.removed.empty())
+        Zulm::requireEdits(edits, options.recording);
+    if (!options.frames.empty())
+        return;
+    if (options.output.empty())
+        throw CLI::RequiredError("either -o OUT or --frames DIR");
+    if (options.isGif && options.fps > s_mostGifFps)
+        throw CLI::ValidationError(fmt::format("--fps {}: a GIF has at most {} frames a second; players show more of "
+                                               "them slower",
+                                               *options.fps, s_mostGifFps));
+    const std::string extension = options.isGif ? ".gif" : ".mp4";
+    if (!options.output.ends_with(extension))
+        throw CLI::ValidationError(
+            fmt::format("{}: the name of the film must end in {}{}", options.output, extension,
+                        options.output.ends_with(".gif") ? "; --gif makes an animated GIF" : ""));
 }
 
 } // namespace Render

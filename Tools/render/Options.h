@@ -1,10 +1,11 @@
 #pragma once
 
-// The command lines of `zulm render` and `zulm guide`.
+// The options of `zulm render` and `zulm guide`. `zulm` describes them in its manual; the renderer reads them.
 
-#include "Tools/render/FilmWriter.h"
-#include "Tools/render/Stage.h"
+#include "Tools/render/FilmSize.h"
 #include "Tools/zulm/EditOptions.h"
+
+#include <CLI/CLI.hpp>
 
 #include <optional>
 #include <string>
@@ -32,12 +33,17 @@ struct RenderOptions : SourceOptions {
     bool removesIdle = false;
     double idleLeast = 5; ///< seconds without activity that are cut
     double idleRest = 1;  ///< seconds that are left of them
-    FilmSettings film;
-    bool hasFps = false;
+    std::optional<double> fps;
+    std::string codec = "h264"; ///< of libavcodec
+    std::optional<int> quality;
     bool isSilent = false;
     bool isGif = false;
     std::string frames;     ///< a folder, or empty
     std::vector<double> at; ///< the times of the film of the frames
+};
+
+struct GuideOptions : SourceOptions {
+    std::string folder;
 };
 
 /// Returns the files that a command reads, as they were named.
@@ -46,14 +52,13 @@ std::vector<std::string> inputsOf(const SourceOptions& options);
 std::vector<std::string> inputsOf(const RenderOptions& options);
 ///@}
 
-struct GuideOptions : SourceOptions {
-    std::string folder;
-};
-
-/// Returns nothing after --help or --version. Throws `CLI::ParseError` for options that make no sense.
+/// Add the command that reads the options.
 ///@{
-std::optional<RenderOptions> renderOptionsOf(std::vector<std::string> words);
-std::optional<GuideOptions> guideOptionsOf(std::vector<std::string> words);
+CLI::App* addRenderOptions(CLI::App& app, RenderOptions& options);
+CLI::App* addGuideOptions(CLI::App& app, GuideOptions& options);
 ///@}
+
+/// Throws the usage error unless the options make sense together.
+void requireSense(const RenderOptions& options);
 
 } // namespace Render

@@ -93,7 +93,7 @@ public:
                     ranges.push_back({from, to});
             };
             const auto times = track.times();
-            if (countsUnknown)
+            if (countsUnknown && (track.empty() || place.from < times.front()))
                 add(place.from, track.empty() ? place.to : std::min(place.to, times.front()));
             const std::size_t holding = track.countUntil(place.from); // entries at one time may be the last of it
             const std::size_t first = holding > 0 ? track.countUntil(std::nextafter(times[holding - 1], -HUGE_VAL)) : 0;

@@ -2,18 +2,13 @@
 
 // Where everything is in a film: the movie lies in a frame, through which a camera looks at the recorded display.
 
+#include "Tools/render/FilmSize.h"
 #include "Tools/render/Resampler.h"
 #include "Tools/render/Style.h"
 #include "ZULMetaDataSession/Insights/Camera.h"
 #include "ZULMetaDataSession/Picture.h"
 
 namespace Render {
-
-/// The size of a film in pixels; both are even.
-struct FilmSize {
-    int width = 0;
-    int height = 0;
-};
 
 /// The parts of a film that stay where they are.
 class Stage {

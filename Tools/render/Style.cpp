@@ -7,7 +7,6 @@
 #include <fmt/core.h>
 #include <fmt/ranges.h>
 
-#include <algorithm>
 #include <utility>
 
 namespace Render {
@@ -118,15 +117,6 @@ Style readStyle(std::string_view document, const std::string& file) {
     return changed(changed({}, s_productStyle, "product"), document, file);
 }
 
-std::vector<std::string> shippedStyles() {
-    return {"plain", "product"};
-}
-
-bool isShippedStyle(const std::string& name) {
-    const std::vector<std::string> names = shippedStyles();
-    return std::find(names.begin(), names.end(), name) != names.end();
-}
-
 Style styleOf(const std::string& name) {
     if (isShippedStyle(name))
         return readStyle(name == "plain" ? s_plainStyle : s_productStyle, name);
@@ -134,7 +124,7 @@ Style styleOf(const std::string& name) {
         throw Failure(
             fmt::format("{}: no style has this name; there are {}, and files whose names end in .json or have "
                         "a slash",
-                        name, fmt::join(shippedStyles(), ", ")));
+                        name, fmt::join(s_shippedStyles, ", ")));
     return readStyle(shortFile(name, "a style"), name);
 }
 

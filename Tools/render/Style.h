@@ -7,7 +7,6 @@
 #include <optional>
 #include <string>
 #include <string_view>
-#include <vector>
 
 namespace Render {
 
@@ -68,13 +67,7 @@ std::optional<KeyDisplay> keyDisplayOf(const std::string& name);
 /// Reads a document. Throws `Zulm::Failure` that names the file, the line and the key for anything that is no style.
 Style readStyle(std::string_view document, const std::string& file);
 
-/// Returns whether a style is one of those that ship, whatever files there are.
-bool isShippedStyle(const std::string& name);
-
 /// Returns the style of this name: one of those that ship, or a file. Throws `Zulm::Failure`.
 Style styleOf(const std::string& name);
-
-/// Returns the names of the styles that ship.
-std::vector<std::string> shippedStyles();
 
 } // namespace Render

@@ -20,12 +20,6 @@ namespace Zulm {
 
 namespace {
 
-/// Commands that the help shows under one heading.
-struct CommandGroup {
-    const char* heading;
-    std::vector<void (*)(CLI::App& app, Action& chosen)> commands;
-};
-
 /// All commands, in the order of the help.
 const std::vector<CommandGroup> s_commandGroups{
     {"Record", {addRecordCommand}},
@@ -195,14 +189,14 @@ void refuseStandardOutput(CLI::App& command) {
             option->check(CLI::Validator(refused, ""));
 }
 
-void define(CLI::App& app, Action& chosen) {
+void define(CLI::App& app, const std::vector<CommandGroup>& groups, Action& chosen) {
     app.set_version_flag("--version", "zulm " ZULM_VERSION, "Print the version and end");
     app.set_help_flag("-h,--help", "Print this help and end");
     app.formatter(std::make_shared<HelpPage>());
     app.require_subcommand(0, 1);
     app.fallthrough();
     addSettings(app);
-    for (const CommandGroup& group : s_commandGroups)
+    for (const CommandGroup& group : groups)
         for (const auto addCommand : group.commands) {
             addCommand(app, chosen);
             CLI::App* command = app.get_subcommands([](CLI::App*) { return true; }).back();
@@ -218,14 +212,12 @@ void define(CLI::App& app, Action& chosen) {
 
 } // namespace
 
-ExitCode runCommandLine(int argc, char** argv) {
+ExitCode runCommandLine(const std::vector<CommandGroup>& groups, int argc, char** argv) {
     CLI::App app("Looks into the metadata of screen recordings, checks and rescues it, and puts it into movies.",
                  "zulm");
     Action chosen;
     std::string format;
-    if (const SisterProgram* sister = argc > 1 ? sisterProgramOf(argv[1]) : nullptr)
-        return become(*sister, {argv + 2, argv + argc});
-    define(app, chosen);
+    define(app, groups, chosen);
     app.add_option("--generate", format)->group("");
     try {
         std::vector<std::string> words = wordsOf(argc, argv);
@@ -239,6 +231,12 @@ ExitCode runCommandLine(int argc, char** argv) {
     if (!format.empty())
         return generate(app, format);
     return chosen ? run(chosen) : refuse(app, "no command is given");
+}
+
+ExitCode runCommandLine(int argc, char** argv) {
+    if (const SisterProgram* sister = argc > 1 ? sisterProgramOf(argv[1]) : nullptr)
+        return become(*sister, {argv + 2, argv + argc});
+    return runCommandLine(s_commandGroups, argc, argv);
 }
 
 } // namespace Zulm

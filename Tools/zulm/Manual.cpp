@@ -135,9 +135,10 @@ std::vector<std::string> groupsOf(const Manual& manual) {
 
 std::string generated(const Manual& manual, const std::string& format) {
     using Render = std::string (*)(const Manual&);
-    constexpr std::pair<const char*, Render> renders[]{{"man", manPage},           {"man-record", recorderManPage},
-                                                       {"markdown", markdownPage}, {"bash", bashCompletion},
-                                                       {"zsh", zshCompletion},     {"fish", fishCompletion}};
+    constexpr std::pair<const char*, Render> renders[]{
+        {"man", manPage},           {"man-record", recorderManPage}, {"man-render", rendererManPage},
+        {"markdown", markdownPage}, {"bash", bashCompletion},        {"zsh", zshCompletion},
+        {"fish", fishCompletion}};
     for (const auto& [name, render] : renders)
         if (format == name)
             return render(manual);

@@ -46,8 +46,12 @@ struct Manual {
 Manual manualOf(const CLI::App& app);
 ManualCommand manualOfCommand(const CLI::App& command);
 
-/// The command that is a program of its own.
+/// The commands that are programs of their own.
+///@{
 inline constexpr auto s_recordCommand = "record";
+inline constexpr auto s_renderCommand = "render";
+inline constexpr auto s_guideCommand = "guide";
+///@}
 
 /// The options of the tool that may also follow the command: all but --version, and without the names that the command
 /// has for options of its own. The recorder knows --help alone.
@@ -69,11 +73,12 @@ inline constexpr std::pair<const char*, const char*> s_exitCodes[]{
 /// What every page says about what is printed.
 extern const char* const s_aboutOutput;
 
-/// `format` is "man", "man-record", "markdown", "bash", "zsh" or "fish"; empty for any other.
+/// `format` is "man", "man-record", "man-render", "markdown", "bash", "zsh" or "fish"; empty for any other.
 std::string generated(const Manual& manual, const std::string& format);
 
 std::string manPage(const Manual& manual);
 std::string recorderManPage(const Manual& manual);
+std::string rendererManPage(const Manual& manual);
 std::string markdownPage(const Manual& manual);
 std::string bashCompletion(const Manual& manual);
 std::string zshCompletion(const Manual& manual);

@@ -7,6 +7,7 @@
 #include <fmt/ranges.h>
 
 #include <algorithm>
+#include <string_view>
 
 namespace Zulm {
 
@@ -90,6 +91,11 @@ std::string eachCommand(const Manual& manual, const std::string& group, Render r
     return text;
 }
 
+const ManualCommand& commandOf(const Manual& manual, std::string_view name) {
+    return *std::find_if(manual.commands.begin(), manual.commands.end(),
+                         [name](const ManualCommand& command) { return command.name == name; });
+}
+
 } // namespace
 
 std::string manPage(const Manual& manual) {
@@ -121,15 +127,31 @@ std::string recorderManPage(const Manual& manual) {
         {"128+n",
          "A second signal, with the number n, ended the recorder at once. The folder with the recording is kept."},
     };
-    const auto command = std::find_if(manual.commands.begin(), manual.commands.end(),
-                                      [](const ManualCommand& each) { return each.name == s_recordCommand; });
+    const ManualCommand& command = commandOf(manual, s_recordCommand);
     return fmt::format(".TH ZULM-RECORD 1 \"\" \"zulm {}\" \"User Commands\"\n.nh\n.ad l\n.SH NAME\nzulm\\-record \\- "
                        "record the screen of an X display\n.SH SYNOPSIS\n.B {}\n.SH DESCRIPTION\n{}.\n.SH OPTIONS\n",
-                       ZULM_VERSION, roff(command->usage()), roff(command->description)) +
-           roffOptions(command->options) + roffOptions(globalOptions(manual, *command)) + roffCodes(codes) +
+                       ZULM_VERSION, roff(command.usage()), roff(command.description)) +
+           roffOptions(command.options) + roffOptions(globalOptions(manual, command)) + roffCodes(codes) +
            ".SH ENVIRONMENT\n.TP\n.B DISPLAY\nThe X display.\n.TP\n.B XDG_RUNTIME_DIR\nThe folder with the socket by "
            "which the recorder is controlled.\n.SH EXAMPLES\n" +
-           roffExamples(command->examples) + ".SH SEE ALSO\n.BR zulm (1)\n";
+           roffExamples(command.examples) + ".SH SEE ALSO\n.BR zulm (1)\n";
+}
+
+std::string rendererManPage(const Manual& manual) {
+    const ManualCommand& film = commandOf(manual, s_renderCommand);
+    const ManualCommand& guide = commandOf(manual, s_guideCommand);
+    std::string page = fmt::format(
+        ".TH ZULM-RENDER 1 \"\" \"zulm {}\" \"User Commands\"\n.nh\n.ad l\n.SH NAME\nzulm\\-render \\- make films and "
+        "guides of screen recordings\n.SH SYNOPSIS\n.B {}\n.br\n.B {}\n.SH DESCRIPTION\nThis is the program that "
+        "\\fBzulm "
+        "render\\fR and \\fBzulm guide\\fR start.\n",
+        ZULM_VERSION, roff(film.usage()), roff(guide.usage()));
+    for (const ManualCommand* command : {&film, &guide})
+        page += fmt::format(".SH ZULM {}\n{}.\n", command == &film ? "RENDER" : "GUIDE", roff(command->description)) +
+                roffOptions(command->options);
+    return page + ".SH OPTIONS OF BOTH\n" + roffOptions(globalOptions(manual, film)) + roffCodes(s_exitCodes) +
+           ".SH EXAMPLES\n" + roffExamples(film.examples) + roffExamples(guide.examples) +
+           ".SH SEE ALSO\n.BR zulm (1),\n.BR zulm\\-record (1)\n";
 }
 
 std::string markdownPage(const Manual& manual) {

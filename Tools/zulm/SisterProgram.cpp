@@ -1,6 +1,7 @@
 #include "Tools/zulm/SisterProgram.h"
 
 #include "Tools/record/Options.h"
+#include "Tools/render/Options.h"
 #include "Tools/zulm/Manual.h"
 
 #include <fmt/core.h>
@@ -14,6 +15,7 @@
 #include <filesystem>
 #include <memory>
 #include <system_error>
+#include <utility>
 
 namespace Zulm {
 
@@ -21,12 +23,9 @@ namespace {
 
 namespace fs = std::filesystem;
 
-constexpr std::array s_sisters{
-    SisterProgram{s_recordCommand, "zulm-record", "record", "", false},
-    SisterProgram{"render", "zulm-render", "render",
-                  "Make a film of a recording, with its cursor drawn in ('zulm render --help')", true},
-    SisterProgram{"guide", "zulm-render", "render",
-                  "Make a guide of a recording, a step for each click ('zulm guide --help')", true}};
+constexpr std::array s_sisters{SisterProgram{s_recordCommand, "zulm-record", "record", false},
+                               SisterProgram{s_renderCommand, "zulm-render", "render", true},
+                               SisterProgram{s_guideCommand, "zulm-render", "render", true}};
 
 /// The places of a program: beside this one, where both were built, and where the shell looks for programs.
 std::vector<std::string> pathsOf(const SisterProgram& sister) {
@@ -40,12 +39,15 @@ std::vector<std::string> pathsOf(const SisterProgram& sister) {
     return paths;
 }
 
-void addSister(CLI::App& app, Action& chosen, std::string_view name) {
-    const SisterProgram& sister = *sisterProgramOf(name);
-    CLI::App* command = app.add_subcommand(std::string(name), sister.description);
-    command->allow_extras();
-    command->callback([command, &chosen, &sister] {
-        chosen = [words = command->remaining(), &sister] { return become(sister, words); };
+/// Has a command refused that another word stands before. `given` takes its options, and nobody reads them: the program
+/// does.
+template <class Given>
+void refuseLater(CLI::App& command, Action& chosen, std::shared_ptr<Given> given) {
+    command.callback([name = command.get_name(), given = std::move(given), &chosen] {
+        chosen = [name] {
+            complain(fmt::format("'{0}' must be the first word, as in 'zulm {0} --help'", name));
+            return ExitUsage;
+        };
     });
 }
 
@@ -78,24 +80,21 @@ ExitCode become(const SisterProgram& sister, const std::vector<std::string>& wor
 }
 
 void addRecordCommand(CLI::App& app, Action& chosen) {
-    const auto given = std::make_shared<Recorder::GivenOptions>(); // which nobody reads: the recorder does
+    const auto given = std::make_shared<Recorder::GivenOptions>();
     CLI::App* command = app.add_subcommand(s_recordCommand, Recorder::s_aboutRecording);
     Recorder::addRecordingOptions(*command, *given);
     command->footer(Recorder::s_recordingExamples);
-    command->callback([given, &chosen] {
-        chosen = [] {
-            complain("'record' must be the first word, as in 'zulm record --help'");
-            return ExitUsage;
-        };
-    });
+    refuseLater(*command, chosen, given);
 }
 
 void addRenderCommand(CLI::App& app, Action& chosen) {
-    addSister(app, chosen, "render");
+    const auto given = std::make_shared<Render::RenderOptions>();
+    refuseLater(*Render::addRenderOptions(app, *given), chosen, given);
 }
 
 void addGuideCommand(CLI::App& app, Action& chosen) {
-    addSister(app, chosen, "guide");
+    const auto given = std::make_shared<Render::GuideOptions>();
+    refuseLater(*Render::addGuideOptions(app, *given), chosen, given);
 }
 
 } // namespace Zulm

@@ -8,13 +8,12 @@
 
 namespace Zulm {
 
-/// A command that is a program of its own, so that `zulm` needs none of its libraries. It reads all of its words
-/// itself, --help and --json too.
+/// A command that is a program of its own, so that `zulm` needs none of its libraries. The program reads all of its
+/// words itself, --help too; `zulm` knows its options for the manual and the completions.
 struct SisterProgram {
     std::string_view command; ///< the word after `zulm`
     const char* program;      ///< its name
     const char* folder;       ///< of its sources, and of what is built of them
-    const char* description;  ///< for the help of `zulm`; empty if it knows the options too
     bool takesCommand;        ///< whether its first word is the command, because it has several
 };
 

@@ -3,6 +3,10 @@ set(render_tests ${CMAKE_CURRENT_LIST_DIR})
 set(render_programs "")
 if(ZULMETADATA_RENDERER)
   set(render_programs ZULM_RENDER=$<TARGET_FILE:zulm-render>)
+
+  zulm_add_tests(RendererTests JsonFieldsTest KeyCapsTest OptionsTest RedactionsTest SoundTrackTest StageTest StyleTest
+    TimeMapTest)
+  target_link_libraries(RendererTests PRIVATE zulm_render_parts)
 endif()
 # Each suite of the script is a test. They are skipped if the renderer is not built.
 foreach(suite IN ITEMS Marker Sound Styles Captions Cursor Outputs Hostile Redaction Golden Guide)
