@@ -51,15 +51,10 @@ py::dtype entryType() {
 /// fraction of the time of making it, which counts if many recordings are read.
 template <class Kind>
 py::dtype copiedEntryType() {
-    static py::handle made; // neither is ever destroyed, because Python ends before
-    static py::handle typeOfTypes;
-    if (!made) {
-        typeOfTypes = py::object(py::module_::import("numpy").attr("dtype")).release();
+    static py::handle made; // never destroyed, because Python ends before
+    if (!made)
         made = entryType<Kind>().release();
-    }
-    constexpr bool align = false;
-    constexpr bool copy = true;
-    return typeOfTypes(made, align, copy);
+    return made.attr("newbyteorder")("|"); // which keeps the order; the type's own constructor makes no copy
 }
 
 void requireDecodable(const std::optional<MetaDataHeader>& header, const uuid& type, const std::string& name) {

@@ -266,9 +266,11 @@ def test_names_that_are_not_utf8_stay_apart(recordings):
     for name in names:
         shutil.copy(recordings / "2.dat", name)
     scan = zulmetadata.scan(names, KIND)
-    assert scan.to_pandas()["recording"].unique().tolist() == names
+    assert [batch.recording for batch in scan] == names
+    shown = [str(recordings / name) for name in (r"na\udcfe.dat", r"na\udcff.dat")]
+    assert scan.to_pandas()["recording"].unique().tolist() == shown
     frame = scan.to_dask(partition_recordings=1)
-    assert frame.compute(scheduler="processes")["recording"].unique().tolist() == names
+    assert frame.compute(scheduler="processes")["recording"].unique().tolist() == shown
 
 
 def test_fields_that_are_renamed_are_those_of_one_array(recordings):
