@@ -32,24 +32,65 @@ std::size_t readStream(std::istream& input, std::uint64_t position, std::span<ch
     return static_cast<std::size_t>(input.gcount());
 }
 
+[[noreturn]] void throwReason(int code, const char* sentence) {
+    throw std::system_error(code == 0 ? EIO : code, std::generic_category(), sentence);
+}
+
+/// A file that is only read. It has no buffer, because whoever reads small pieces has one of their own, and no stream,
+/// whose locale would take longer to set up than a small file to read.
+class UnbufferedFile {
+public:
+    explicit UnbufferedFile(const std::string& path) {
+        std::error_code unknown;
+        const std::filesystem::file_status found = std::filesystem::status(path, unknown);
+        open(path, std::filesystem::is_fifo(found));
+        if (!std::filesystem::is_regular_file(found))
+            throwReason(unknown ? unknown.value() : EINVAL, "is not a regular file");
+    }
+
+    std::uint64_t size() {
+        const std::int64_t size = toInt64(buffer_.pubseekoff(0, std::ios_base::end, std::ios_base::in));
+        if (size < 0)
+            throwReason(EIO, "cannot be read");
+        return static_cast<std::uint64_t>(size);
+    }
+
+    std::size_t read(std::uint64_t position, std::span<char> bytes) {
+        try {
+            const auto target = static_cast<std::streamoff>(position);
+            if (std::streamoff(buffer_.pubseekpos(target, std::ios_base::in)) == target)
+                return static_cast<std::size_t>(
+                    buffer_.sgetn(bytes.data(), static_cast<std::streamsize>(bytes.size())));
+        } catch (const std::ios_base::failure&) { // the reading failed
+        }
+        throwReason(EIO, "cannot be read");
+    }
+
+private:
+    /// Does what `fileOpen` does with a stream: it does not open a pipe, and opens again after a signal.
+    void open(const std::string& path, bool isPipe) {
+        if (isPipe)
+            throwReason(EINVAL, "cannot be opened");
+        buffer_.pubsetbuf(nullptr, 0);
+        do {
+            errno = 0;
+            buffer_.open(path, std::ios_base::in | std::ios_base::binary);
+        } while (!buffer_.is_open() && errno == EINTR);
+        if (!buffer_.is_open())
+            throwReason(errno, "cannot be opened");
+    }
+
+    std::filebuf buffer_;
+};
+
 } // namespace
 
 ByteSource::ByteSource(std::uint64_t size, Read read) : read_(std::move(read)), size_(size) {}
 
 ByteSource ByteSource::file(const std::string& path) {
-    const auto file = std::make_shared<std::ifstream>();
-    file->rdbuf()->pubsetbuf(nullptr, 0); // whoever reads small pieces has a buffer of its own
-    errno = 0;
-    fileOpen(*file, path.c_str(), std::ios_base::binary);
-    const std::error_code reason(errno, std::generic_category());
-    if (!file->is_open())
-        throw std::system_error(reason ? reason : std::make_error_code(std::errc::io_error), "cannot be opened");
-    std::error_code error;
-    if (!std::filesystem::is_regular_file(path, error))
-        throw std::system_error(error ? error : std::make_error_code(std::errc::invalid_argument),
-                                "is not a regular file");
-    return {sizeOf(*file),
-            [file](std::uint64_t position, std::span<char> bytes) { return readStream(*file, position, bytes); }};
+    const auto file = std::make_shared<UnbufferedFile>(path);
+    return {file->size(),
+            [file](std::uint64_t position, std::span<char> bytes) { return file->read(position, bytes); }};
 }
 
 ByteSource ByteSource::stream(std::istream& input) {

@@ -47,32 +47,53 @@ py::dtype entryType() {
     return py::dtype::from_args(fields);
 }
 
-/// The stored bytes themselves, in memory that the array owns.
+/// Returns the type as a new object, because Python code may rename the fields of an array in place. Copying it takes a
+/// fraction of the time of making it, which counts if many recordings are read.
 template <class Kind>
-py::array arrayOverStream(const ByteSource& stream) {
+py::dtype copiedEntryType() {
+    static py::handle made; // never destroyed, because Python ends before
+    if (!made)
+        made = entryType<Kind>().release();
+    return made.attr("newbyteorder")("|"); // which keeps the order; the type's own constructor makes no copy
+}
+
+void requireDecodable(const std::optional<MetaDataHeader>& header, const uuid& type, const std::string& name) {
+    if (!header || header->uuid != type || !isDecodable(*header))
+        throwValueError(name + ": the entries cannot be decoded: the version of the stream is not known, or its "
+                               "header does not state the entry size of its kind");
+}
+
+/// The stored bytes themselves, in memory that the array owns. The header is read with them, so that one read is
+/// enough.
+template <class Kind>
+py::array arrayOverStream(const ByteSource& stream, const std::string& name) {
     constexpr std::size_t entrySize = sizeof(double) + sizeof(typename Kind::Value);
     std::unique_ptr<char[]> bytes;
+    std::optional<MetaDataHeader> header;
     std::size_t count = 0;
     {
         const py::gil_scoped_release others;
-        const std::uint64_t body = stream.size() - std::min<std::uint64_t>(stream.size(), s_metaDataHeaderSize);
-        const std::size_t whole = static_cast<std::size_t>(body / entrySize) * entrySize;
-        bytes.reset(new char[whole]);
-        count = stream.read(s_metaDataHeaderSize, {bytes.get(), whole}) / entrySize;
+        const auto size = static_cast<std::size_t>(stream.size());
+        bytes.reset(new char[size]);
+        const std::size_t got = stream.read(0, {bytes.get(), size});
+        if (got >= s_metaDataHeaderSize) {
+            header = detail::numberIn<MetaDataHeader>({bytes.get(), got}, 0);
+            count = (got - s_metaDataHeaderSize) / entrySize;
+        }
     }
-    const char* data = bytes.get();
+    requireDecodable(header, Kind::type, name);
+    const char* data = bytes.get() + s_metaDataHeaderSize;
     const py::capsule owner(bytes.release(), [](void* memory) { delete[] static_cast<char*>(memory); });
-    const py::dtype type = entryType<Kind>();
+    const py::dtype type = copiedEntryType<Kind>();
     if (static_cast<std::size_t>(type.itemsize()) != entrySize)
         throw std::logic_error("a record is not what an entry is");
     return {type, {count}, {entrySize}, data, owner};
 }
 
 template <class Value>
-std::vector<TimedValue<Value>> decodeAll(const ByteSource& stream) {
+std::vector<TimedValue<Value>> decodeAll(StreamEntries& entries) {
     const py::gil_scoped_release others;
     std::vector<TimedValue<Value>> decoded;
-    StreamEntries entries(stream);
     while (const auto entry = entries.next())
         if (auto fitting = decodeEntry<Value>(entries.bytesOf(*entry), entries.header()->version))
             decoded.push_back(std::move(*fitting));
@@ -105,15 +126,23 @@ py::tuple rowOf(double time, const CursorImage& cursor, const py::dtype&) {
                           image);
 }
 
+/// Reads the header.
+StreamEntries entriesIn(const ByteSource& stream) {
+    const py::gil_scoped_release others;
+    return StreamEntries(stream);
+}
+
 template <class Kind>
-py::array entriesOfKind(const ByteSource& stream) {
+py::array entriesOfKind(const ByteSource& stream, const std::string& name) {
     using Value = typename Kind::Value;
     if constexpr (FixedSizeValue<Value>) {
-        return arrayOverStream<Kind>(stream);
+        return arrayOverStream<Kind>(stream, name);
     } else {
+        StreamEntries entries = entriesIn(stream);
+        requireDecodable(entries.header(), Kind::type, name);
         const py::dtype type = entryType<Kind>();
         py::list rows;
-        for (const TimedValue<Value>& entry : decodeAll<Value>(stream))
+        for (const TimedValue<Value>& entry : decodeAll<Value>(entries))
             rows.append(rowOf(entry.time, entry.value, type));
         return py::module_::import("numpy").attr("array")(rows, type);
     }
@@ -152,12 +181,14 @@ py::array readEntries(const StreamSource& source) {
 }
 
 py::array readEntries(const ByteSource& stream, const std::string& name) {
-    const std::optional<MetaDataHeader> header = StreamEntries(stream).header();
-    if (!header || !isDecodable(*header))
-        throwValueError(name + ": the entries cannot be decoded: the version of the stream is not known, or its "
-                               "header does not state the entry size of its kind");
+    const std::optional<MetaDataHeader> header = entriesIn(stream).header();
+    requireDecodable(header, header ? header->uuid : uuid(), name);
+    return readEntriesOf(header->uuid, stream, name);
+}
+
+py::array readEntriesOf(const uuid& type, const ByteSource& stream, const std::string& name) {
     py::array array;
-    RecordedKinds::visit(header->uuid, [&]<class Kind>() { array = entriesOfKind<Kind>(stream); });
+    RecordedKinds::visit(type, [&]<class Kind>() { array = entriesOfKind<Kind>(stream, name); });
     return array;
 }
 

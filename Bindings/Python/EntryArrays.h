@@ -3,6 +3,7 @@
 // The entries of a stream as one NumPy array: a record for each, its fields named as the keys of an `EntryDictionary`.
 
 #include "ZULMetaData/ByteSource.h"
+#include "ZULMetaData/ZULMMetaDataUUIDs.h"
 #include "ZULMetaDataBridge/Source/MetaDataKinds.h"
 #include "ZULMetaDataBridge/Source/StreamSource.h"
 
@@ -33,5 +34,8 @@ py::list coordinatesOf(const std::string& kind);
 py::array readEntries(const StreamSource& stream);
 py::array readEntries(const ByteSource& stream, const std::string& name);
 ///@}
+
+/// The same for a stream whose kind is known, which must be a recorded one. Numbers are read at once with the header.
+py::array readEntriesOf(const uuid& type, const ByteSource& stream, const std::string& name);
 
 } // namespace ZULMetaData::Python

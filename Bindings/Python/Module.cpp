@@ -67,11 +67,11 @@ RecordingSummary lookInto(const FileLocation& file) {
 /// Looks for one stream and for nothing else, because a scan of many recordings opens each of them for it.
 py::object readKind(const FileLocation& file, const std::string& kind) {
     const uuid type = kindNamed(kind).type;
-    const RecordingFile recording = openRecording(file);
-    for (const StreamInfo& stream : recording.streams())
-        if (stream.type == type)
-            return readEntries(recording.bytesOf(stream), recording.name());
-    return py::none();
+    RecordingFile recording = openRecording(file);
+    const auto [offset, length] = recording.parser().fileDataForUUID(type);
+    if (offset == 0 && length == 0)
+        return py::none();
+    return readEntriesOf(type, recording.bytes().part(offset, length), recording.name());
 }
 
 py::bytes bytesOf(const RecordedStream& stream) {

@@ -364,6 +364,28 @@ TEST_F(ExportCommand, KeepsTheBytesOfANameThatIsNotUTF8) {
               out + ": recordings exported: 0, already there: 1; new files: 0\n");
 }
 
+TEST_F(ExportCommand, TellsNamesApartThatAreNotUTF8) {
+    const std::vector<std::string> names{positions("na\xff.dat", 1), positions("na\xfe.dat", 1),
+                                         positions("na\\xff.dat", 1)};
+    const ToolResult result = exported(names);
+    EXPECT_EQ(result.exitCode, 0) << result.errors;
+    EXPECT_THAT(rows("cursorLocation"), ElementsAre(folder / "na\\xff.dat,0,0,0.0", folder / "na\\xfe.dat,0,0,0.0",
+                                                    folder / "na\\\\xff.dat,0,0,0.0"));
+}
+
+TEST_F(ExportCommand, RefusesANameThatLooksLikeAnother) {
+    const std::string first = positions("na\xff.dat", 1);
+    const std::string second = positions("na\xfe.dat", 2);
+    for (int run = 0; run < 2; ++run) {
+        const ToolResult result = exported({"--format", "ndjson", first, second});
+        EXPECT_EQ(result.exitCode, 1);
+        EXPECT_THAT(result.errors, HasSubstr("na\\xfe.dat: looks like " + (folder / "na\\xff.dat") +
+                                             " in the tables, because a name is not UTF-8; rename one of them"));
+        const std::string lines = contentsOf(out + "/kind=cursorLocation/part-00000.ndjson");
+        EXPECT_EQ(std::count(lines.begin(), lines.end(), '\n'), 1);
+    }
+}
+
 TEST_F(ExportCommand, LetsNobodyReadAPartWhoMayNotReadItsRecordings) {
     using std::filesystem::perms;
     const std::string open = positions("open.dat", 1);
@@ -546,6 +568,17 @@ TEST_F(ExportParquet, KeepsEveryCharacterAndNumber) {
     const std::vector<std::string> found = answers("FROM 'kind=topmostAppName/part-00000.parquet'");
     ASSERT_EQ(found.size(), 1U);
     EXPECT_EQ(Json::parse(found.front()), (Json{file, text, 5e-324, "topmostAppName"}));
+}
+
+TEST_F(ExportParquet, TellsNamesApartThatAreNotUTF8) {
+    const std::vector<std::string> names{positions("na\xff.dat", 1), positions("na\xfe.dat", 1),
+                                         positions("na\\xff.dat", 1)};
+    const ToolResult result = exported({"--format", "parquet", names[0], names[1], names[2]});
+    EXPECT_EQ(result.exitCode, 1);
+    EXPECT_THAT(result.errors, HasSubstr("looks like"));
+    EXPECT_THAT(
+        answers("SELECT recording FROM 'kind=cursorLocation/*.parquet' ORDER BY recording"),
+        ElementsAre(Json::array({folder / "na\\xfe.dat"}).dump(), Json::array({folder / "na\\xff.dat"}).dump()));
 }
 
 TEST_F(ExportParquet, JoinsPiecesToOneFile) {

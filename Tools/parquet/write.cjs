@@ -1,10 +1,12 @@
-// Writes files of Parquet with DuckDB: node write.cjs REQUEST
+// Writes files of Parquet with DuckDB: node write.cjs < REQUEST
 //
-// The request is a JSON object. "folder" is where its names begin. "lines" names a file with one JSON object in each
-// line, "columns" has the names and types of its columns, and "longest" is the size of its longest line; or else
-// "parts" names files of Parquet that become one. "output" names the new file. An empty request writes nothing, and
-// fails if DuckDB is not installed.
+// The request is a JSON object. It comes on standard input, because it may be longer than an argument. "folder" is where
+// its names begin. "lines" names a file with one JSON object in each line, "columns" has the names and types of its
+// columns, and "longest" is the size of its longest line; or else "parts" names files of Parquet that become one.
+// "output" names the new file. An empty request writes nothing, and fails if DuckDB is not installed.
 'use strict';
+
+const { readFileSync } = require('node:fs');
 
 const MIB = 2 ** 20;
 const MEMORY = 256 * MIB;
@@ -47,7 +49,7 @@ async function write(request) {
 const parent = process.ppid;
 setInterval(() => process.ppid === parent || process.exit(1), 500).unref(); // nobody waits for the file then
 
-write(JSON.parse(process.argv[2])).catch(error => {
+write(JSON.parse(readFileSync(process.stdin.fd, 'utf8'))).catch(error => {
     const isMissing = error.code === 'MODULE_NOT_FOUND';
     console.error(isMissing ? `DuckDB is not installed; run 'npm ci' in ${__dirname}` : error.message);
     process.exitCode = 1;

@@ -10,6 +10,7 @@
 #include <array>
 #include <cerrno>
 #include <csignal>
+#include <cstdio>
 #include <cstring>
 #include <fcntl.h>
 #include <memory>
@@ -54,10 +55,29 @@ private:
     std::optional<Descriptor> writeEnd_;
 };
 
+/// A file without a name from which the program reads its input, as long as that may be. A pipe could send this program
+/// a signal if the other one ended before it had read everything.
+class ChildInput {
+public:
+    explicit ChildInput(std::string_view bytes) : file_(std::tmpfile(), std::fclose) {
+        const bool isWritten = file_ && std::fwrite(bytes.data(), 1, bytes.size(), file_.get()) == bytes.size() &&
+                               std::fflush(file_.get()) == 0 && std::fseek(file_.get(), 0, SEEK_SET) == 0;
+        if (!isWritten)
+            throw Failure(fmt::format("no temporary file can be written: {}", std::strerror(errno)));
+        fcntl(number(), F_SETFD, FD_CLOEXEC);
+    }
+
+    int number() const { return fileno(file_.get()); }
+
+private:
+    std::unique_ptr<std::FILE, int (*)(std::FILE*)> file_;
+};
+
 /// In a process group of its own, so that the terminal's signals reach this program alone, which then cleans up.
 class Child {
 public:
-    Child(const std::vector<std::string>& words, const Pipe& output, const Pipe& errors) {
+    Child(const std::vector<std::string>& words, const std::optional<ChildInput>& input, const Pipe& output,
+          const Pipe& errors) {
         std::vector<char*> arguments;
         arguments.reserve(words.size() + 1);
         for (const std::string& word : words)
@@ -67,7 +87,10 @@ public:
         posix_spawnattr_t attributes;
         posix_spawn_file_actions_init(&files);
         posix_spawnattr_init(&attributes);
-        posix_spawn_file_actions_addopen(&files, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
+        if (input)
+            posix_spawn_file_actions_adddup2(&files, input->number(), STDIN_FILENO);
+        else
+            posix_spawn_file_actions_addopen(&files, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
         posix_spawn_file_actions_adddup2(&files, output.writeEnd(), STDOUT_FILENO);
         posix_spawn_file_actions_adddup2(&files, errors.writeEnd(), STDERR_FILENO);
         posix_spawnattr_setflags(&attributes, POSIX_SPAWN_SETPGROUP);
@@ -110,10 +133,14 @@ std::string_view readSome(int file, std::array<char, 65536>& buffer) {
 
 } // namespace
 
-ChildResult runChild(const std::vector<std::string>& words, const std::function<void(std::string_view bytes)>& take) {
+ChildResult runChild(const std::vector<std::string>& words, const std::function<void(std::string_view bytes)>& take,
+                     std::string_view input) {
+    std::optional<ChildInput> childInput;
+    if (!input.empty())
+        childInput.emplace(input);
     Pipe output;
     Pipe errors;
-    Child child(words, output, errors);
+    Child child(words, childInput, output, errors);
     output.closeWriteEnd();
     errors.closeWriteEnd();
     ChildResult result;

@@ -14,10 +14,11 @@ struct ChildResult {
     std::string errors; ///< the beginning of what it wrote on standard error
 };
 
-/// Runs a program that is searched for in PATH, without a shell. Its standard input is empty. Calls `take` with what it
-/// writes on standard output, as it comes. If a signal is noted meanwhile (see `NotedSignals`) or `take` throws, the
-/// program is killed first. Throws `Failure` if it cannot be started.
-ChildResult runChild(const std::vector<std::string>& words, const std::function<void(std::string_view bytes)>& take);
+/// Runs a program that is searched for in PATH, without a shell. It finds `input` on standard input. Calls `take` with
+/// what it writes on standard output, as it comes. If a signal is noted meanwhile (see `NotedSignals`) or `take`
+/// throws, the program is killed first. Throws `Failure` if it cannot be started.
+ChildResult runChild(const std::vector<std::string>& words, const std::function<void(std::string_view bytes)>& take,
+                     std::string_view input = {});
 
 /// Returns a function that calls `take` with each line of the bytes that it is called with.
 std::function<void(std::string_view bytes)> inLines(std::function<void(std::string_view line)> take);

@@ -11,7 +11,9 @@
 #include <fmt/core.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <cstdlib>
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <set>
@@ -76,15 +78,16 @@ std::pair<std::string, RecordingState> recordingOf(const Json& line) {
 /// Reads lines up to a length, so that a damaged file takes no memory.
 class Lines {
 public:
-    explicit Lines(const std::string& path) : path_(path), file_(path, std::ios::binary), buffer_(s_longestLine) {}
+    explicit Lines(const std::string& path) : path_(path), file_(openInput(path)), buffer_(s_longestLine) {}
 
     /// Returns nothing after the last one. Throws `Failure`.
     std::optional<std::string_view> next() {
         ++number_;
+        errno = 0;
         if (file_.getline(buffer_.data(), static_cast<std::streamsize>(buffer_.size())))
             return std::string_view(buffer_.data(), static_cast<std::size_t>(file_.gcount()) - (file_.eof() ? 0 : 1));
-        if (file_.bad() || !file_.is_open())
-            throw Failure(fmt::format("{}: cannot be read", path_));
+        if (file_.bad())
+            throw Failure(fmt::format("{}: cannot be read: {}", path_, std::strerror(errno)));
         if (!file_.eof())
             throwDamage();
         return std::nullopt;
@@ -101,6 +104,17 @@ private:
     std::vector<char> buffer_;
     std::uint64_t number_ = 0;
 };
+
+/// Returns what is in a folder, which is opened again if a signal interrupts that. Throws `Failure`.
+std::filesystem::directory_iterator filesIn(const std::string& folder) {
+    std::error_code error;
+    std::filesystem::directory_iterator files(folder, error);
+    while (error == std::errc::interrupted)
+        files = std::filesystem::directory_iterator(folder, error);
+    if (error)
+        throw Failure(fmt::format("{}: {}", folder, error.message()));
+    return files;
+}
 
 /// Throws `Failure` if the folder of a kind is somewhere else.
 void requireNoLink(const std::string& folder) {
@@ -175,7 +189,7 @@ void DataSet::openManifest(const Description& description) {
     const std::string path = pathOf(s_manifestName);
     const std::string header = headerLine(description);
     if (!std::filesystem::exists(path)) {
-        if (std::any_of(std::filesystem::directory_iterator(folder_), std::filesystem::directory_iterator(),
+        if (std::any_of(filesIn(folder_), std::filesystem::directory_iterator(),
                         [](const auto& entry) { return !entry.path().filename().string().starts_with("."); }))
             throw Failure(fmt::format("{}: is a folder with other files in it; name a new one", folder_));
         return replaceDurably(path, header + '\n');
@@ -190,7 +204,7 @@ void DataSet::readManifest() {
     while (const auto line = lines.next())
         try {
             const auto [path, state] = recordingOf(Json::parse(*line));
-            names_[state.name] = path;
+            names_[nameInRows(state.name, format_)] = path;
             manifest_[path] = state;
         } catch (const Json::exception&) {
             lines.throwDamage();
@@ -200,11 +214,16 @@ void DataSet::readManifest() {
 }
 
 void DataSet::removeLeftovers() const {
-    for (const auto& entry : std::filesystem::directory_iterator(folder_))
+    using ZULMetaData::LockFile;
+    for (const auto& entry : filesIn(folder_)) {
+        const bool isLock = entry.path().filename().string().starts_with(std::string(s_lockName) + '.');
+        if (isLock && LockFile::stateOf(entry.path()) == LockFile::State::Left) // before it had its name
+            std::filesystem::remove(entry.path());
         if (entry.is_directory() && !entry.is_symlink() && entry.path().filename().string().starts_with(s_folderBegin))
-            for (const auto& file : std::filesystem::directory_iterator(entry.path()))
+            for (const auto& file : filesIn(entry.path().string()))
                 if (isUnfinished(file.path().string()))
                     std::filesystem::remove(file.path());
+    }
 }
 
 bool DataSet::claim(const std::string& path) {
@@ -215,10 +234,14 @@ bool DataSet::claim(const std::string& path) {
 void DataSet::takeName(const std::string& path) {
     const std::lock_guard lock(mutex_);
     const std::string absolute = absolutePath(path);
-    const std::string& other = names_.try_emplace(path, absolute).first->second;
-    if (other != absolute)
-        throw Failure(
-            fmt::format("{}: is the name of {} in {}; name the recording by its absolute path", path, other, folder_));
+    const std::string& other = names_.try_emplace(nameInRows(path, format_), absolute).first->second;
+    if (other == absolute)
+        return;
+    if (nameInRows(other, format_) == nameInRows(absolute, format_))
+        throw Failure(fmt::format("{}: looks like {} in the tables, because a name is not UTF-8; rename one of them",
+                                  path, other));
+    throw Failure(
+        fmt::format("{}: is the name of {} in {}; name the recording by its absolute path", path, other, folder_));
 }
 
 std::optional<RecordingState> DataSet::stateOf(const std::string& path) const {
@@ -232,7 +255,7 @@ std::unique_ptr<TablePart> DataSet::newPart(Table& table, const TableHead& head)
         requireNoLink(pathOf(folder));
         createFolder(pathOf(folder));
         table.next = 0;
-        for (const auto& file : std::filesystem::directory_iterator(pathOf(folder)))
+        for (const auto& file : filesIn(pathOf(folder)))
             if (const std::string name = file.path().filename().string(); name.starts_with(s_partBegin))
                 table.next = std::max<std::uint64_t>(*table.next,
                                                      std::strtoull(name.c_str() + s_partBegin.size(), nullptr, 10) + 1);
@@ -289,8 +312,13 @@ void DataSet::endPart(Table& table) {
 
 void DataSet::endRecording(const std::string& path, const RecordingState& state) {
     const std::lock_guard lock(mutex_);
-    done_.push_back(manifestLine(absolutePath(path), state));
-    access_.addInput(path);
+    try {
+        access_.addInput(path);
+        done_.push_back(manifestLine(absolutePath(path), state));
+    } catch (...) { // its rows must not be committed without it
+        hasFailed_ = true;
+        throw;
+    }
 }
 
 void DataSet::commitIfDue() {
@@ -377,8 +405,10 @@ bool DataSet::isPartName(const std::string& part) const {
 DataSet::Commit DataSet::readCommit(const std::string& journal) const {
     Commit commit;
     try {
-        std::ifstream file(journal, std::ios::binary);
-        const Json found = Json::parse(file);
+        const Json found = onFile(journal, [&] {
+            std::ifstream file = openInput(journal);
+            return Json::parse(file);
+        });
         commit.parts = found.at("parts").get<std::vector<std::string>>();
         const Json& recordings = found.at("recordings");
         for (const Json& line : recordings) {

@@ -19,6 +19,7 @@
 #include <memory>
 #include <optional>
 #include <string_view>
+#include <utility>
 
 namespace Zulm {
 
@@ -31,6 +32,7 @@ constexpr auto s_recordingColumn = "recording";
 constexpr auto s_furtherColumn = "further";
 constexpr auto s_imageColumn = "image";
 constexpr std::uint64_t s_megabyte = 1 << 20;
+constexpr std::uint64_t s_mostHeld = 4 * s_megabyte; // of the lines of one recording
 constexpr std::uint64_t s_fewestMegabytes = 1;
 constexpr std::uint64_t s_mostMegabytes = 4096;
 
@@ -84,11 +86,13 @@ public:
             if (!RecordedKinds::visit(stream.type,
                                       [&]<class Kind>() { worst = worseOf(worst, readStream<Kind>(stream)); }))
                 say(fmt::format("{}: entries of {} cannot be decoded", recording_.name(), stream.name()));
+        appendHeld();
         return worst;
     }
 
     std::uint64_t checksum() const { return checksum_.value(); }
     std::uint64_t entries() const { return entries_; }
+    bool hasAppended() const { return hasAppended_; } ///< returns whether the data set has some of the entries
 
 private:
     template <class Kind>
@@ -113,9 +117,9 @@ private:
             if (dataSet_)
                 lines += lineOf<Kind>(*decoded, keys, name);
             if (lines.size() >= s_megabyte)
-                pass(head, lines);
+                hold(head, lines);
         }
-        pass(head, lines);
+        hold(head, lines);
         const std::uint64_t end = canBeDecoded ? damage.value_or(entries.wholeBytes()) : 0;
         return dataSet_ ? complainAboutRest(recording_, stream, end, "exported") : ExitFine;
     }
@@ -138,7 +142,10 @@ private:
             if (format_ == TableFormat::Parquet)
                 entry[s_imageColumn] = imageOf(decoded.value);
         Json line;
-        addText(line, s_recordingColumn, recording_.name());
+        if (format_ == TableFormat::Parquet)
+            line[s_recordingColumn] = nameInRows(recording_.name(), format_);
+        else
+            addText(line, s_recordingColumn, recording_.name());
         line.update(entry);
         return jsonLine(line) + '\n';
     }
@@ -149,11 +156,23 @@ private:
         return base64({reinterpret_cast<const char*>(cursor.imageData), cursor.imageDataSize});
     }
 
-    void pass(const TableHead& head, std::string& lines) {
+    /// Takes the lines. A recording that fails early then leaves nothing in the data set, and the next run tries again.
+    void hold(const TableHead& head, std::string& lines) {
         NotedSignals::check();
-        if (!lines.empty())
+        if (lines.empty())
+            return;
+        heldBytes_ += lines.size();
+        held_.emplace_back(head, std::exchange(lines, {}));
+        if (heldBytes_ >= s_mostHeld)
+            appendHeld();
+    }
+
+    void appendHeld() {
+        hasAppended_ = hasAppended_ || !held_.empty();
+        for (const auto& [head, lines] : held_)
             dataSet_->append(head, lines);
-        lines.clear();
+        held_.clear();
+        heldBytes_ = 0;
     }
 
     const RecordingFile& recording_;
@@ -161,6 +180,9 @@ private:
     DataSet* dataSet_;
     Checksum checksum_;
     std::uint64_t entries_ = 0;
+    std::vector<std::pair<TableHead, std::string>> held_;
+    std::size_t heldBytes_ = 0;
+    bool hasAppended_ = false;
 };
 
 /// Exports recordings that the data set does not have.
@@ -207,9 +229,10 @@ private:
             ++exported_;
             tell(report, path, "exported", work.entries());
             return recording.streams().empty() ? complainAboutNothing(recording, {}) : code;
-        } catch (...) { // some of its entries may be in the data set
+        } catch (...) {
             state.isWhole = false;
-            dataSet_.endRecording(path, state);
+            if (work.hasAppended())
+                dataSet_.endRecording(path, state);
             throw;
         }
     }

@@ -56,7 +56,11 @@ FileAccess::FileAccess(const std::string& path, const std::vector<std::string>& 
 }
 
 void FileAccess::addInput(const std::string& input) {
-    const auto status = statusOfInput(input);
+    auto status = statusOfInput(input);
+    if (!status && input != "-") { // it may have been removed meanwhile
+        status.emplace();
+        status->st_mode = S_IFREG | S_IRUSR | S_IWUSR;
+    }
     if (!status || !S_ISREG(status->st_mode))
         return;
     const auto isSame = [&](const struct stat& known) {

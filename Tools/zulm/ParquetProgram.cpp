@@ -53,7 +53,8 @@ void ParquetProgram::join(const std::vector<std::string>& parts, const std::stri
 void ParquetProgram::run(const Json& request, const std::string& output) const {
     Json whole{{"folder", folder_}};
     whole.update(request);
-    const ChildResult result = runChild({"node", program_, jsonLine(whole)}, [](std::string_view) {});
+    const ChildResult result = runChild(
+        {"node", program_}, [](std::string_view) {}, jsonLine(whole));
     if (result.exitCode == 0)
         return;
     std::string reason = result.errors;

@@ -2,6 +2,7 @@
 
 #include "Platform/DurableFile.h"
 #include "Platform/NewFile.h"
+#include "Reports/Text.h"
 #include "Tools/zulm/Failure.h"
 #include "Tools/zulm/OnFile.h"
 #include "Tools/zulm/OutputFile.h"
@@ -140,6 +141,13 @@ private:
 std::string nameOf(TableFormat format) {
     constexpr std::array names{"csv", "ndjson", "parquet"};
     return names.at(static_cast<std::size_t>(format));
+}
+
+std::string nameInRows(const std::string& name, TableFormat format) {
+    if (format == TableFormat::CSV)
+        return shownLines(name);
+    const std::string valid = validText(name);
+    return format == TableFormat::NDJSON || valid == name ? valid : shownLines(name);
 }
 
 std::string hiddenName(const std::string& part) {

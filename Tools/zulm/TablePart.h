@@ -16,6 +16,9 @@ enum class TableFormat { CSV, NDJSON, Parquet };
 /// Returns "csv", which is also the extension of the files.
 std::string nameOf(TableFormat format);
 
+/// Returns how the rows show a recording of this name. Two names may look alike if one of them is not UTF-8.
+std::string nameInRows(const std::string& name, TableFormat format);
+
 /// What the rows of a table are.
 struct TableHead {
     std::string kind;

@@ -6,6 +6,8 @@
 #include "ZULMetaData/Containers/RecordingInfo.h"
 
 #include <algorithm>
+#include <array>
+#include <cstddef>
 #include <stdexcept>
 #include <utility>
 
@@ -25,8 +27,14 @@ std::unique_ptr<MetaDataParser> opened(const std::string& name, Open open) {
     }
 }
 
-Container::Type recognizedType(const ByteSource& bytes, const std::string& name) {
-    const RecognizedContainer recognized = recognizeContainer(bytes, name);
+/// Reads the first bytes through the stream of the parser, which then need not be read again to find the metadata.
+Container::Type recognizedType(std::istream& input, std::uint64_t size, const std::string& name) {
+    std::array<char, s_recognitionBytes> first;
+    input.read(first.data(), first.size());
+    const auto count = static_cast<std::size_t>(input.gcount());
+    input.clear();
+    input.seekg(0);
+    const RecognizedContainer recognized = recognizeContainer({first.data(), count}, size, name);
     if (recognized.type == Container::Unknown)
         throw std::runtime_error(recognized.refusal());
     return recognized.type;
@@ -44,7 +52,8 @@ RecordingFile::RecordingFile(std::string path, std::string name, std::optional<B
     : path_(std::move(path)), name_(name.empty() ? path_ : std::move(name)),
       bytes_(bytes ? namedSource(*bytes, name_) : openSource(path_, name_)),
       input_(std::make_unique<ByteSourceStream>(bytes_)), parser_(opened(name_, [this, messages] {
-          return openContainer(*input_, recognizedType(bytes_, path_.empty() ? name_ : path_), messages);
+          const std::string& named = path_.empty() ? name_ : path_;
+          return openContainer(*input_, recognizedType(*input_, bytes_.size(), named), messages);
       })) {}
 
 std::optional<double> RecordingFile::duration() const {

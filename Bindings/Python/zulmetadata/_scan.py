@@ -52,6 +52,11 @@ def _paths_of(recordings: _Path | Iterable[_Path]) -> Iterator[str]:
         yield os.fspath(recordings)
 
 
+def _in_a_frame(path: str) -> str:
+    """Returns the path with escapes for bytes that are not UTF-8. Without them pandas takes different names for one."""
+    return path.encode(errors="backslashreplace").decode()
+
+
 class Reader:
     """Reads one kind of entries of a group of recordings. It is pickled into the workers of Dask, which know it as a
     function from which they may ask for fewer columns."""
@@ -92,7 +97,7 @@ class Reader:
         whole: dict[str, _Array] = {}
         for name in self.columns:
             if name == "recording":
-                names = np.array([batch.recording for batch in batches], object)
+                names = np.array([_in_a_frame(batch.recording) for batch in batches], object)
                 whole[name] = np.repeat(names, [len(batch.time) for batch in batches])
             else:
                 # One contiguous copy of each column, so that the bytes of the streams need not stay.
@@ -113,7 +118,8 @@ class Reader:
 def failures_frame(failures: Sequence[Failure]) -> Any:
     """Returns failures as a frame of texts."""
     pandas = importlib.import_module("pandas")
-    return pandas.DataFrame(failures, columns=_FAILURE_COLUMNS, dtype=object)
+    rows = [failure._replace(recording=_in_a_frame(failure.recording)) for failure in failures]
+    return pandas.DataFrame(rows, columns=_FAILURE_COLUMNS, dtype=object)
 
 
 def _first(pair: tuple[Any, Any]) -> Any:

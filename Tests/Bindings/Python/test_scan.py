@@ -3,6 +3,7 @@
 import os
 import pathlib
 import pickle
+import shutil
 import subprocess
 import sys
 import threading
@@ -11,6 +12,7 @@ import time
 import numpy as np
 import pytest
 import zulmetadata
+from zulmetadata import _core
 
 KIND = "cursorLocation"
 
@@ -257,6 +259,24 @@ def test_reading_lets_other_threads_run(recordings, read):
     finally:
         sys.setswitchinterval(interval)
         other.join()
+
+
+def test_names_that_are_not_utf8_stay_apart(recordings):
+    names = [os.fsdecode(os.fsencode(recordings) + name) for name in (b"/na\xfe.dat", b"/na\xff.dat")]
+    for name in names:
+        shutil.copy(recordings / "2.dat", name)
+    scan = zulmetadata.scan(names, KIND)
+    assert [batch.recording for batch in scan] == names
+    shown = [str(recordings / name) for name in (r"na\udcfe.dat", r"na\udcff.dat")]
+    assert scan.to_pandas()["recording"].unique().tolist() == shown
+    frame = scan.to_dask(partition_recordings=1)
+    assert frame.compute(scheduler="processes")["recording"].unique().tolist() == shown
+
+
+def test_fields_that_are_renamed_are_those_of_one_array(recordings):
+    first = _core.read_kind(str(recordings / "4.dat"), KIND)
+    first.dtype.names = ("when", "column", "row")
+    assert _core.read_kind(str(recordings / "4.dat"), KIND).dtype.names == ("time", "x", "y")
 
 
 def test_arrays_of_batches_stay(recordings):

@@ -9,6 +9,7 @@ import shutil
 
 import check
 import recordings
+from datasets import has_temporary_files, problem_between
 from faults import files_in, write_files
 from recordings import fast_folder
 
@@ -40,6 +41,7 @@ class Command:
     output: bytes = b""
     left: dict[str, bytes] = dataclasses.field(default_factory=dict)  # files in the folder behind it
     allocations: int = 0
+    makes_data_set: bool = False
 
     def name(self):
         return "zulm " + " ".join(self.words)
@@ -53,6 +55,7 @@ class Ended:
     output: bytes
     errors: bytes
     left: dict[str, bytes]
+    after: dict[str, bytes] | None = None  # files in the folder after the same run with all the memory there is
 
 
 class Tool:
@@ -67,6 +70,15 @@ class Tool:
     def run(self, environment):
         return check.run([self.program, *self.command.words], cwd=self.folder, stdin=check.subprocess.DEVNULL,
                          environment={"LD_PRELOAD": str(self.shim)} | environment)
+
+    def ended_in(self, place, status):
+        """Returns how a run ended there, and runs an export once more."""
+        ended = Ended(os.waitstatus_to_exitcode(status), (place / "output").read_bytes(),
+                      (place / "errors").read_bytes(), files_in(place / "files"))
+        if self.command.makes_data_set:
+            again = check.run([self.program, *self.command.words], cwd=place / "files")
+            ended.after = files_in(place / "files") if again.returncode == 0 else None
+        return ended
 
     def measure(self):
         """Fills in what the command does with all the memory there is."""
@@ -85,9 +97,7 @@ class Tool:
                          "ALLOCATION_STEP": str(numbers.step), "ALLOCATIONS_BEHIND": str(int(all_behind))})
         for line in done.stdout.splitlines():
             number, status = map(int, line.split())
-            place = self.folder / str(number)
-            yield number, Ended(os.waitstatus_to_exitcode(status), (place / "output").read_bytes(),
-                                (place / "errors").read_bytes(), files_in(place / "files"))
+            yield number, self.ended_in(self.folder / str(number), status)
 
 
 def commands(context):
@@ -119,6 +129,8 @@ def commands(context):
         Command(["repair", "--in-place", "m.mp4"], {"m.mp4": bare}),
         Command(["view", "r.mp4", "-o", "o.html", "--page", "p.html"], recorded | {"p.html": b"<head></head>"}),
         Command(["stamp", "--in-place", "m.mp4", "--creator", "C", "--creator-version", "1"], {"m.mp4": bare}),
+        Command(["export", "--format", "ndjson", "a.dat", "b.dat", "-o", "out"], {"a.dat": location, "b.dat": keys},
+                makes_data_set=True),
     ]
 
 
@@ -127,13 +139,17 @@ def complaint(command, ended):
     error = ended.errors.decode(errors="replace").strip()
     if ended.code < 0:
         return f"was ended by signal {-ended.code}: {error}"
-    if (ended.code, ended.output, ended.left) == (command.code, command.output, command.left):
+    if command.makes_data_set and (wrong := problem_between(ended.left, ended.after, command.left)):
+        return wrong
+    if command.makes_data_set and has_temporary_files(ended.after):
+        return "left a temporary file"
+    left = command.left if command.makes_data_set else ended.left  # the times in the manifest are others in each run
+    if (ended.code, ended.output, left) == (command.code, command.output, command.left):
         return None  # there was another way
     if ended.code != FAILED:
         return f"ended with {ended.code} and a wrong result: {error}"
     if not OUT_OF_MEMORY.search(ended.errors):
         return f"ended with 1, but said {error!r}"
-    left = ended.left
     wrong = {name for name, contents in left.items() if contents not in (command.files.get(name), command.left.get(name))}
     wrong |= {name for name in command.files if name not in left}
     return f"left {', '.join(sorted(wrong))} as nothing that it should be" if wrong else None

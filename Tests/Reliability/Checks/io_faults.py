@@ -7,6 +7,7 @@ import re
 import shutil
 
 from check import Result
+from datasets import has_temporary_files, problem_between, shown_rows
 from faults import (OPEN_MOVIE, WHOLE_MOVIE, Fault, count_calls, files_in, is_crash, recording, run_with, small_streams,
                     write_files)
 from recordings import HEADER, entry_ends, fast_folder, sized_atom
@@ -28,6 +29,8 @@ class Case:
     arguments: list[str]  # run in the folder of the files
     files: dict[str, bytes]
     changed: str = ""     # the file that is changed in place
+    before: list[str] = dataclasses.field(default_factory=list)  # run first, without faults
+    goes_on: bool = False  # run once more at the end, without faults
 
 
 def cases(streams):
@@ -69,23 +72,35 @@ class Outcome:
     output: bytes
     errors: str
     files: dict[str, bytes]
+    next: "Outcome | None" = None  # of the run at the end
+
+
+def outcome(ended, folder):
+    return Outcome(ended.returncode, ended.stdout, ended.stderr.decode(errors="replace"), files_in(folder))
+
+
+def begin(context, folder, case, program):
+    write_files(folder, case.files)
+    if case.before:
+        run_with(context, Fault("none"), [program, *case.before], folder=folder).check_returncode()
 
 
 def perform(context, root, case, program, fault):
     """Runs a case in a new folder. None where it crashes or hangs."""
     folder = root / "work"
-    write_files(folder, case.files)
+    begin(context, folder, case, program)
     ended = run_with(context, fault, [program, *case.arguments], folder=folder)
-    files = files_in(folder)
+    got = None if is_crash(ended) else outcome(ended, folder)
+    if got and case.goes_on:
+        ended = run_with(context, Fault("none"), [program, *case.arguments], folder=folder)
+        got.next = None if is_crash(ended) else outcome(ended, folder)
     shutil.rmtree(folder)
-    if is_crash(ended):
-        return None
-    return Outcome(ended.returncode, ended.stdout, ended.stderr.decode(errors="replace"), files)
+    return got
 
 
 def calls_of(context, root, case, program, kind):
     folder = root / "count"
-    write_files(folder, case.files)
+    begin(context, folder, case, program)
     calls = count_calls(context, kind, [program, *case.arguments], folder=folder)
     shutil.rmtree(folder)
     return calls
@@ -161,6 +176,34 @@ def damage_of(case, fault, got, usual):
     return "" if movie in (before, usual.files["Movie.mp4"][:len(before)]) else "changes the movie"
 
 
+def export_case(streams):
+    """The second recording is added to a data set that has the first one."""
+    export = ["export", "--format", "ndjson", "-o", "out"]
+    return Case("export", [*export, "First.mp4", "Second.mp4"],
+                {name: recording(streams) for name in ("First.mp4", "Second.mp4")},
+                before=[*export, "First.mp4"], goes_on=True)
+
+
+def damage_of_data_set(case, fault, got, usual):
+    """The same for an export: entries are there once or not at all, and the next run adds those that are missing."""
+    if found := problem_between(got.files, got.next and got.next.files, usual.files):
+        return found
+    if has_temporary_files(got.next.files) and not fault.again:
+        return "leaves a temporary file"
+    if got.next.code != 0:
+        return f"lets the next run end with {got.next.code}: {got.next.errors!r}"
+    is_usual = (got.code, got.output, shown_rows(got.files)) == (usual.code, usual.output, shown_rows(usual.files))
+    if fault.kind in INVISIBLE:
+        return "" if is_usual and got.errors == usual.errors else "shows"
+    if is_usual:
+        return ""
+    if got.code != 1:
+        return "has another result"
+    names = (*case.files, *OUTPUTS, "standard output")
+    reasons = (*REASONS, "another program writes to this data set")  # nobody can tell if the lock cannot be examined
+    return "" if says_which_file_and_why(got.errors, usual.errors, names, reasons) else "does not say which file and why"
+
+
 def check_case(context, root, case, program, problem, result):
     usual = perform(context, root, case, program, Fault("none"))
     for kind, again in FAULTS:
@@ -183,6 +226,7 @@ def run(context):
         root = pathlib.Path(name)
         for case in cases(small_streams(context)):
             check_case(context, root, case, context.zulm, problem_of, result)
+        check_case(context, root, export_case(small_streams(context)), context.zulm, damage_of_data_set, result)
         entries = "20" if context.full else "2"
         for name in ("session", "one-session"):
             session = Case(f"recording a {name}", [name, ".", entries], {"Movie.mp4": OPEN_MOVIE})
