@@ -10,6 +10,7 @@
 #include "Insights/Chapters.h"
 #include "Insights/Clicks.h"
 #include "Insights/CursorPath.h"
+#include "Insights/CursorSpeed.h"
 #include "Insights/Idle.h"
 #include "Insights/Insights.h"
 #include "Insights/KeyCaptions.h"

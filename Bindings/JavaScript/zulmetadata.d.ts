@@ -137,7 +137,17 @@ export class Recording {
    * Windows or Command nevertheless.
    */
   insights(
-    name: 'clicks' | 'captions' | 'idle' | 'chapters' | 'zooms' | 'cursor_path' | 'camera' | 'activity' | 'applications',
+    name:
+      | 'clicks'
+      | 'captions'
+      | 'idle'
+      | 'chapters'
+      | 'zooms'
+      | 'cursor_path'
+      | 'cursor_speed'
+      | 'camera'
+      | 'activity'
+      | 'applications',
     parameters?: Record<string, number | boolean>,
   ): Table;
   /**

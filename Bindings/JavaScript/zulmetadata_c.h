@@ -104,12 +104,13 @@ ZulmEntries* zulm_read_hidden(ZulmRecording* recording, size_t index);
    is where the last entry says; otherwise it moves between two entries, but rests while nothing was recorded. */
 ZulmEntries* zulm_states(ZulmRecording* recording, const double* times, size_t count, int32_t interpolates);
 
-/* Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path", "camera",
-   "activity" or "applications". `parameters` is null or a list such as "least=3". The captions have one row for each
-   key: "label" is its text, with a bullet in place of what was typed unless "shows_keys=1", or "shows_shortcuts=1" for
-   what was typed with Control, Windows or Command; "is_typed" is 1 if it makes words with its neighbours; "first" is
-   the row that begins its caption, and "end" the time until which the caption is shown. The activity is one row for the
-   span from "start" up to "end", and the applications are those that were on top in it. */
+/* Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path",
+   "cursor_speed", "camera", "activity" or "applications". `parameters` is null or a list such as "least=3". The
+   captions have one row for each key: "label" is its text, with a bullet in place of what was typed unless
+   "shows_keys=1", or "shows_shortcuts=1" for what was typed with Control, Windows or Command; "is_typed" is 1 if it
+   makes words with its neighbours; "first" is the row that begins its caption, and "end" the time until which the
+   caption is shown. The activity is one row for the span from "start" up to "end", and the applications are those that
+   were on top in it. */
 ZulmEntries* zulm_insight(ZulmRecording* recording, const char* name, const char* parameters);
 
 /* Returns the streams for a movie that was cut by an edit list: one row for each, with "kind" and all its "bytes".

@@ -1,6 +1,7 @@
 #include "Bindings/Tables/SessionTables.h"
 
 #include "ZULMetaDataSession/EditList.h"
+#include "ZULMetaDataSession/Insights/CursorSpeed.h"
 #include "ZULMetaDataSession/Insights/Insights.h"
 #include "ZULMetaDataSession/Retiming.h"
 #include "ZULMetaDataSession/Snapshot.h"
@@ -278,6 +279,13 @@ Table pathRows(const InsightSources& sources, const InsightOptions& options, dou
     return table;
 }
 
+Table speedRows(const InsightSources& sources, const InsightOptions&, double) {
+    const std::vector<CursorSpeed> speeds = cursorSpeedsOf(sources.positions);
+    Table table{startsOf(speeds), {}, {}};
+    table.add("speed", speeds, [](const CursorSpeed& speed) { return speed.speed; });
+    return table;
+}
+
 Table cameraRows(const InsightSources& sources, const InsightOptions& options, double rate) {
     const Camera camera(zoomsIn(sources, options), pathIn(sources, options), sources.screen, options.camera);
     Table table{timesAt(rate, sources.duration), {}, {}};
@@ -359,6 +367,7 @@ const std::vector<InsightTable>& insightTables() {
           {"speed_cutoff", setOption<&Options::path, &CursorPathOptions::speedCutoff>},
           {"rest", setOption<&Options::path, &CursorPathOptions::rest>}},
          pathRows},
+        {"cursor_speed", {}, speedRows},
         {"camera",
          {{"settle_time", setOption<&Options::camera, &CameraOptions::settleTime>},
           {"follows_cursor", setOption<&Options::camera, &CameraOptions::followsCursor>},

@@ -20,8 +20,8 @@ Table statesTable(const Recording& recording, std::span<const double> times, Int
 /// Parameters of insights by their names, such as {"idle_least", 3}.
 using InsightParameters = std::map<std::string, double, std::less<>>;
 
-/// Returns "clicks", "captions", "idle", "chapters", "zooms", "cursor_path", "camera", "activity" or "applications".
-/// Throws `std::invalid_argument` for another name and for a parameter that the table does not have.
+/// Returns "clicks", "captions", "idle", "chapters", "zooms", "cursor_path", "cursor_speed", "camera", "activity" or
+/// "applications". Throws `std::invalid_argument` for another name and for a parameter that the table does not have.
 Table insightTable(const Recording& recording, std::string_view name, const InsightParameters& parameters);
 
 std::vector<const char*> insightNames(); ///< in the order above

@@ -318,7 +318,7 @@ TEST_F(CInterface, LivesThroughEveryDamagedFile) {
             EXPECT_EQ(entries != nullptr, stream.isKnown == 1) << file.name;
             EXPECT_LE(entries ? zulm_entry_count(entries.get()) : 0, stream.entries) << file.name;
         }
-        for (const char* name : {"clicks", "captions", "idle", "chapters", "zooms"})
+        for (const char* name : {"clicks", "captions", "idle", "chapters", "zooms", "cursor_speed"})
             EXPECT_TRUE(ReadEntries(zulm_insight(recording.get(), name, nullptr))) << file.name << zulm_last_error();
         constexpr double time = 0.5;
         const ReadEntries states(zulm_states(recording.get(), &time, 1, 1));

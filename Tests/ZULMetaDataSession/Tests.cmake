@@ -12,6 +12,7 @@ zulm_add_tests(ZULMetaDataSessionTests
   Insights/ChaptersTest
   Insights/ClicksTest
   Insights/CursorPathTest
+  Insights/CursorSpeedTest
   Insights/IdleTest
   Insights/InsightsTest
   Insights/KeyCaptionsTest

@@ -1,10 +1,10 @@
 #include "ZULMetaDataSession/Insights/Activity.h"
 
 #include "ZULMetaDataSession/Insights/Insights.h"
+#include "ZULMetaDataSession/Insights/ScreenGeometry.h"
 #include "ZULMetaDataSession/Snapshot.h"
 
 #include <algorithm>
-#include <cmath>
 #include <map>
 #include <optional>
 #include <span>
@@ -42,12 +42,6 @@ private:
     bool containsEnd_;
 };
 
-/// Unlike `std::hypot`, equal on every machine.
-double distanceBetween(const ScreenPoint& left, const ScreenPoint& right) {
-    const ScreenPoint way{right.x - left.x, right.y - left.y};
-    return std::sqrt(way.x * way.x + way.y * way.y);
-}
-
 double distanceIn(const Track<CursorLocationKind>& positions, const SpanWithin& span) {
     const double usual = usualDistance(positions.times());
     const auto placeAt = [&](double time) { return cursorPositionAt(positions, time, Interpolation::Linear, usual); };
@@ -55,15 +49,13 @@ double distanceIn(const Track<CursorLocationKind>& positions, const SpanWithin& 
     double distance = 0;
     const auto moveTo = [&](const ScreenPoint& place) {
         if (before)
-            distance += distanceBetween(*before, place);
+            distance += detail::distanceBetween(*before, place);
         before = place;
     };
     const std::span<const double> times = positions.times();
     const auto first = std::upper_bound(times.begin(), times.end(), span.start());
-    for (auto time = first; time != times.end() && *time <= span.end(); ++time) {
-        const Point& place = positions.values()[static_cast<std::size_t>(time - times.begin())];
-        moveTo({static_cast<double>(place.x), static_cast<double>(place.y)});
-    }
+    for (auto time = first; time != times.end() && *time <= span.end(); ++time)
+        moveTo(detail::screenPoint(positions.values()[static_cast<std::size_t>(time - times.begin())]));
     if (const std::optional<ScreenPoint> last = placeAt(span.end()))
         moveTo(*last);
     return distance;

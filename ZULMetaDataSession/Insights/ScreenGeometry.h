@@ -4,6 +4,8 @@
 
 #include "ZULMetaDataBridge/Source/ApplicationValues.h"
 
+#include <cmath>
+
 namespace ZULMetaData::detail {
 
 inline bool hasArea(const ScreenRect& rect) {
@@ -16,6 +18,16 @@ inline bool contains(const ScreenRect& rect, const ScreenPoint& point) {
 
 inline ScreenPoint middleOf(const ScreenRect& rect) {
     return {rect.x + rect.width / 2, rect.y + rect.height / 2};
+}
+
+inline ScreenPoint screenPoint(const Point& point) {
+    return {static_cast<double>(point.x), static_cast<double>(point.y)};
+}
+
+/// Unlike `std::hypot`, equal on every machine.
+inline double distanceBetween(const ScreenPoint& left, const ScreenPoint& right) {
+    const ScreenPoint way{right.x - left.x, right.y - left.y};
+    return std::sqrt(way.x * way.x + way.y * way.y);
 }
 
 inline ScreenRect screenRect(const Rect& rect) {

@@ -171,9 +171,9 @@ class Recording(Mapping[Kind, _Records]):
 
     def insights(self, name: str, **parameters: float) -> _Records:
         """Returns what follows from the recording: "clicks", "captions", "idle", "chapters", "zooms", "cursor_path",
-        "camera", "activity" or "applications". `dtype.names` of the result lists the fields. Parameters change the
-        defaults of the C++ library, by their names in lower case with underscores, such as `least=3`. Another name
-        raises a `ValueError`. A stream that cannot be decoded is a `UserWarning`."""
+        "cursor_speed", "camera", "activity" or "applications". `dtype.names` of the result lists the fields. Parameters
+        change the defaults of the C++ library, by their names in lower case with underscores, such as
+        `least=3`. Another name raises a `ValueError`. A stream that cannot be decoded is a `UserWarning`."""
         return _table_of(self._opened().insight(name, {key: float(value) for key, value in parameters.items()}))
 
     def retime(

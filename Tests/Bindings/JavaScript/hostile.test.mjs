@@ -27,7 +27,7 @@ async function readAll(bytes, name) {
     verify: await tried(() => recording.verify()),
   };
   for (const { kind } of recording.streams) await tried(() => recording.entries(kind));
-  for (const name of ['captions', 'clicks', 'idle', 'zooms']) await tried(() => recording.insights(name));
+  for (const name of ['captions', 'clicks', 'idle', 'zooms', 'cursor_speed']) await tried(() => recording.insights(name));
   await tried(() => recording.at([0, 1]));
   for (const index of recording.hidden.keys()) await tried(() => recording.hiddenEntries(index));
   return read;
