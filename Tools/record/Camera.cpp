@@ -121,10 +121,8 @@ void Camera::giveUp(const std::string& why) {
 
 void Camera::takePictures() {
     try {
-        while (waitForTick()) {
-            serveTick();
-            skipMissedTicks();
-        }
+        while (waitForTick())
+            skipMissedTicks(serveTick());
     } catch (const std::exception& error) {
         giveUp(error.what());
     }
@@ -153,7 +151,8 @@ bool Camera::isBehind() const {
     return queue_.size() >= s_queuedPictures || (!queue_.empty() && now() - queue_.front().instant > s_longestInQueue);
 }
 
-void Camera::serveTick() {
+/// Returns when the tick was due.
+Instant Camera::serveTick() {
     bool isFull = false;
     Instant due = 0;
     {
@@ -169,13 +168,14 @@ void Camera::serveTick() {
         events_.sawPointer(grabbed->pointerInstant, grabbed->pointer);
     if (!time) {
         countDropped(due); // even if the end has come before its pixels
-        return;
+        return due;
     }
     Picture picture{converted(*grabbed), *time, grabbed->instant};
     const std::lock_guard lock(mutex_);
     queue_.push_back(std::move(picture));
     ++taken_;
     changed_.notify_all();
+    return due;
 }
 
 /// Counts a tick without a frame, if it is one of the recording.
@@ -207,8 +207,10 @@ std::optional<std::int64_t> Camera::movieTime(Instant instant) {
     return time;
 }
 
-void Camera::skipMissedTicks() {
+void Camera::skipMissedTicks(Instant served) {
     const std::lock_guard lock(mutex_);
+    if (served < resumedAt_) // a pause has begun and ended meanwhile, so the next tick is the first one after it
+        return;
     nextTick_ = tick(++ticks_);
     if (!zero_)
         return;

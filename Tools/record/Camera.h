@@ -66,11 +66,11 @@ private:
 
     void takePictures();
     void encodePictures();
-    void serveTick();
+    Instant serveTick();
     bool isBehind() const;
     void countDropped(Instant due);
     bool waitForTick();
-    void skipMissedTicks();
+    void skipMissedTicks(Instant served);
     void countTicksFrom(Instant instant);
     Instant tick(std::int64_t number) const;
     FramePointer emptyPicture();
