@@ -121,7 +121,7 @@ void AccessibilityProcess::take(const std::string& line, const AccessibilityEven
     } else if (what == "answer" && asked_) {
         words >> focus;
         const Instant asked = *std::exchange(asked_, std::nullopt);
-        if (askedWindow_ == windows_)
+        if (askedWindow_ == windows_ && focus != "late")
             events.answer(asked, focusOf(focus));
     } else if (what == "rect" && askedHover_) {
         askedHover_.reset();

@@ -12,6 +12,7 @@
 #include <filesystem>
 #include <iostream>
 #include <memory>
+#include <optional>
 #include <sstream>
 
 namespace Recorder {
@@ -45,31 +46,38 @@ private:
     Object<AtspiAccessible> applicationOf(std::uint32_t process);
     Object<AtspiAccessible> activeWindowOf(AtspiAccessible* application);
     Object<AtspiAccessible> focusIn(AtspiAccessible* accessible, int& visits);
+    bool hasState(AtspiAccessible* accessible, AtspiStateType state);
+    bool stillHasFocus();
+    void searchFocus();
     const char* currentFocus();
 
     std::string pending_;
     std::uint32_t process_ = 0;     ///< of the window on top
     Object<AtspiAccessible> focus_; ///< the last one that an event or a search has found
     std::uint32_t focusProcess_ = 0;
+    bool isLate_ = false; ///< an answer that a search needs was missing
 };
 
-bool hasState(AtspiAccessible* accessible, AtspiStateType state) {
+/// Returns nothing if the application does not answer in time, or no longer has the object.
+std::optional<bool> stateOf(AtspiAccessible* accessible, AtspiStateType state) {
     const Object<AtspiStateSet> states(atspi_accessible_get_state_set(accessible));
-    return states && atspi_state_set_contains(states.get(), state);
+    return states ? std::optional(atspi_state_set_contains(states.get(), state) != FALSE) : std::nullopt;
 }
 
 std::uint32_t processOf(AtspiAccessible* accessible) {
     return atspi_accessible_get_process_id(accessible, nullptr);
 }
 
-/// Returns nullptr if the application does not answer.
+/// An application that has no time says nothing of the focus: keys wait for the next answer.
+constexpr const char* s_late = "late";
+
 const char* kindOf(AtspiAccessible* accessible) {
     GError* error = nullptr;
     atspi_accessible_clear_cache(accessible);
     const AtspiRole role = atspi_accessible_get_role(accessible, &error);
     if (error) {
         g_error_free(error);
-        return nullptr;
+        return s_late;
     }
     return role == ATSPI_ROLE_PASSWORD_TEXT ? "password" : "ordinary";
 }
@@ -78,7 +86,7 @@ const char* kindOf(AtspiAccessible* accessible) {
 bool isInActiveWindow(AtspiAccessible* accessible) {
     Object<AtspiAccessible> object(static_cast<AtspiAccessible*>(g_object_ref(accessible)));
     for (int depth = 0; object && depth < s_farthest; ++depth) {
-        if (hasState(object.get(), ATSPI_STATE_ACTIVE))
+        if (stateOf(object.get(), ATSPI_STATE_ACTIVE).value_or(false))
             return true;
         object.reset(atspi_accessible_get_parent(object.get(), nullptr));
     }
@@ -155,8 +163,7 @@ void Watcher::obey(const std::string& line) {
     if (what == "window") {
         words >> process_;
     } else if (what == "ask") {
-        const char* focus = currentFocus();
-        say(std::string("answer ") + (focus ? focus : "unknown"));
+        say(std::string("answer ") + currentFocus());
     } else if (what == "hover" && words >> x >> y) {
         answerHover(x, y);
     }
@@ -165,10 +172,10 @@ void Watcher::obey(const std::string& line) {
 void Watcher::focused(AtspiAccessible* accessible) {
     const std::uint32_t process = processOf(accessible);
     const bool isOnTop = isInActiveWindow(accessible);
-    const char* kind = isOnTop ? kindOf(accessible) : nullptr;
+    const char* kind = isOnTop ? kindOf(accessible) : "unknown";
     focus_.reset(isOnTop ? static_cast<AtspiAccessible*>(g_object_ref(accessible)) : nullptr);
     focusProcess_ = process;
-    say("focus " + std::to_string(process) + " " + (kind ? kind : "unknown"));
+    say("focus " + std::to_string(process) + " " + kind);
 }
 
 Object<AtspiAccessible> Watcher::applicationOf(std::uint32_t process) {
@@ -184,6 +191,7 @@ Object<AtspiAccessible> Watcher::applicationOf(std::uint32_t process) {
 
 Object<AtspiAccessible> Watcher::activeWindowOf(AtspiAccessible* application) {
     const int count = atspi_accessible_get_child_count(application, nullptr);
+    isLate_ = isLate_ || count < 0;
     for (int i = 0; i < count; ++i) {
         Object<AtspiAccessible> window(atspi_accessible_get_child_at_index(application, i, nullptr));
         if (window && hasState(window.get(), ATSPI_STATE_ACTIVE))
@@ -231,22 +239,47 @@ Object<AtspiAccessible> Watcher::focusIn(AtspiAccessible* accessible, int& visit
     return hasFocus && visits <= s_visitedAtMost ? itself() : nullptr;
 }
 
+bool Watcher::hasState(AtspiAccessible* accessible, AtspiStateType state) {
+    const std::optional<bool> hasIt = stateOf(accessible, state);
+    isLate_ = isLate_ || !hasIt;
+    return hasIt.value_or(false);
+}
+
+bool Watcher::stillHasFocus() {
+    if (!focus_ || focusProcess_ != process_)
+        return false;
+    atspi_accessible_clear_cache(focus_.get());
+    return hasState(focus_.get(), ATSPI_STATE_FOCUSED);
+}
+
+/// What the library has kept of earlier searches does not change with the application, since no event of it is asked
+/// for but those of the focus.
+void Watcher::searchFocus() {
+    focusProcess_ = process_;
+    const Object<AtspiAccessible> application = applicationOf(process_);
+    if (!application)
+        return;
+    atspi_accessible_clear_cache(application.get());
+    const Object<AtspiAccessible> window = activeWindowOf(application.get());
+    int visits = 0;
+    if (window)
+        focus_ = focusIn(window.get(), visits);
+}
+
 /// Asks the application itself each time, so that its answer follows all events that it has sent before.
 const char* Watcher::currentFocus() {
+    constexpr const char* unknown = "unknown";
     if (process_ == 0)
-        return nullptr;
+        return unknown;
+    isLate_ = false;
+    if (stillHasFocus())
+        return kindOf(focus_.get());
+    focus_.reset();
+    if (!isLate_)
+        searchFocus();
     if (focus_)
-        atspi_accessible_clear_cache(focus_.get());
-    if (!focus_ || focusProcess_ != process_ || !hasState(focus_.get(), ATSPI_STATE_FOCUSED)) {
-        focus_.reset();
-        const Object<AtspiAccessible> application = applicationOf(process_);
-        const Object<AtspiAccessible> window = application ? activeWindowOf(application.get()) : nullptr;
-        int visits = 0;
-        if (window)
-            focus_ = focusIn(window.get(), visits);
-        focusProcess_ = process_;
-    }
-    return focus_ ? kindOf(focus_.get()) : nullptr;
+        return kindOf(focus_.get());
+    return isLate_ ? s_late : unknown;
 }
 
 /// Some applications answer with the innermost object, others with the child that it is in.

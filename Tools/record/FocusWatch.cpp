@@ -1,5 +1,6 @@
 #include "Tools/record/FocusWatch.h"
 
+#include <algorithm>
 #include <utility>
 
 namespace Recorder {
@@ -7,7 +8,8 @@ namespace Recorder {
 namespace {
 
 constexpr Instant s_askInterval = 50 * s_millisecond;     ///< while keys wait for an answer
-constexpr Instant s_searchInterval = 200 * s_millisecond; ///< while the focus is not known
+constexpr Instant s_searchInterval = 200 * s_millisecond; ///< while the focus is not known, at least
+constexpr Instant s_longestSearchInterval = s_second;
 constexpr Instant s_firstPause = s_second;
 constexpr Instant s_laterPause = 5 * s_second;
 
@@ -96,6 +98,7 @@ void FocusWatch::serve(bool hasWaitingKeys) {
                                      },
                                      [this](Instant asked, Focus focus) {
                                          pause_ = s_firstPause; // the next outage is another one
+                                         searchTook_ = now() - asked;
                                          privacy_.setFocus(now(), focus);
                                          if (focus != Focus::Unknown)
                                              privacy_.confirm(asked);
@@ -108,7 +111,7 @@ void FocusWatch::serve(bool hasWaitingKeys) {
     else if (hasWaitingKeys)
         process_->ask(s_askInterval);
     else if (privacy_.isFocusUnknown())
-        process_->ask(s_searchInterval);
+        process_->ask(std::clamp(3 * searchTook_, s_searchInterval, s_longestSearchInterval)); // costs the application
 }
 
 } // namespace Recorder

@@ -52,6 +52,7 @@ private:
     bool wasReady_ = false;
     std::optional<Instant> startAt_; ///< when the process is started again
     Instant pause_;                  ///< before it is
+    Instant searchTook_ = 0;         ///< until the last answer came
     WindowObserver* windows_ = nullptr;
     const PointerObserver* pointer_ = nullptr;
     std::optional<Position> hovered_;

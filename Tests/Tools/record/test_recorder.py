@@ -1230,6 +1230,29 @@ class Privacy(Test):
             keys = [entry.value[0] for entry in self.recorded(recording)["keyboardAction"]]
             self.assertEqual([chr(key) for key in keys if key > 32], list("open"))
 
+    def test_what_is_typed_while_the_application_has_no_time_is_recorded(self):
+        """Its answer comes later, and what it says of the focus holds for these keys."""
+        with Desk() as desk:
+            desk.start_bus()
+            if not desk.open_form():
+                self.skipTest("there is no GTK for Python")
+            form = desk.processes[-1]
+            desk.wait_for(lambda: "Form" in desk.xdotool("getactivewindow", "getwindowname"))
+            recording = desk.record_with_bus("all")
+            desk.xdotool("key", "Tab")
+
+            def is_recorded():
+                """On a busy machine the answer may be too late."""
+                form.send_signal(signal.SIGSTOP)
+                desk.xdotool("key", "b", "sleep", "1.2", "key", "c")
+                form.send_signal(signal.SIGCONT)
+                time.sleep(1.5)
+                keys = [chr(entry.value[0]) for entry in recording.entries("keyboardAction")]
+                return keys[-2:] == ["b", "c"]
+
+            desk.wait_for(is_recorded)
+            self.recorded(recording)
+
     def test_a_watcher_that_died_is_started_again(self):
         with Desk() as desk:
             desk.start_bus()
