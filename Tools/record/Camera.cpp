@@ -78,6 +78,7 @@ void Camera::resume(Instant instant) {
     const std::lock_guard lock(mutex_);
     if (!pausedAt_)
         return;
+    dropTicksBefore(*pausedAt_);
     paused_ += instant - *pausedAt_;
     pausedAt_.reset();
     resumedAt_ = instant;
@@ -158,6 +159,7 @@ Instant Camera::serveTick() {
     {
         const std::lock_guard lock(mutex_);
         due = nextTick_;
+        serving_ = due;
         isFull = isBehind();
     }
     const std::optional<GrabbedPicture> grabbed = isFull ? grabber_.askPointer() : grabber_.grab();
@@ -209,6 +211,7 @@ std::optional<std::int64_t> Camera::movieTime(Instant instant) {
 
 void Camera::skipMissedTicks(Instant served) {
     const std::lock_guard lock(mutex_);
+    serving_.reset();
     if (served < resumedAt_) // a pause has begun and ended meanwhile, so the next tick is the first one after it
         return;
     nextTick_ = tick(++ticks_);
@@ -217,6 +220,14 @@ void Camera::skipMissedTicks(Instant served) {
     const Instant present = now();
     const Instant end = std::min({present, pausedAt_.value_or(present), stopAt_.value_or(present)});
     for (; tick(ticks_ + 1) <= end; nextTick_ = tick(++ticks_)) // the one before has passed whole
+        ++dropped_;
+}
+
+/// Counts the ticks before a pause that nobody has served when it ends.
+void Camera::dropTicksBefore(Instant instant) {
+    if (serving_ == nextTick_) // this one is counted when it is served
+        nextTick_ = tick(++ticks_);
+    for (; nextTick_ < instant; nextTick_ = tick(++ticks_))
         ++dropped_;
 }
 

@@ -287,7 +287,7 @@ class Picture(Test):
     def test_the_window_that_is_clicked(self):
         """A click that comes before the recorder waits for one goes to the window, so there are several attempts."""
         with Desk() as desk:
-            window = desk.show(200, 100, 400, 300)
+            desk.show(200, 100, 400, 300)
             desk.show(700, 100, 300, 200)
             desk.xdotool("mousemove", 400, 300)
             recording = desk.record("--window", "click", "--without-accessibility", wait=False)
@@ -298,18 +298,16 @@ class Picture(Test):
                 return "recording " in recording.errors()
 
             desk.wait_for(is_recording)
-            window.tell("title Chosen")
             streams = self.recorded(recording)
             x, y, width, height = streams["recordingRegion"][0].value
             self.assertTrue(x <= 200 and y <= 100 and x + width in range(600, 640) and y + height in range(400, 440),
                             streams["recordingRegion"])
-            self.assertEqual(streams["topmostWindowTitle"][-1].value, "Chosen")
 
     def test_a_screen_that_becomes_smaller_is_recorded_on(self):
         if not shutil.which("xrandr"):
             self.skipTest("there is no xrandr")
         with Desk(manager=None) as desk:
-            desk.show(0, 0, 300, 200, managed=False)
+            window = desk.show(0, 0, 300, 200, managed=False)
             recording = desk.record()
             time.sleep(0.5)
             sides = [number for side in (640, 480) for number in 4 * [str(side)]]
@@ -320,10 +318,9 @@ class Picture(Test):
                 self.skipTest("this server has a screen of one size")
             time.sleep(0.5)
             desk.xdotool("mousemove", 100, 150, "click", 1)
+            desk.wait_for(lambda: window.lines("button"))
             time.sleep(1)
             streams = self.recorded(recording)
-            document = json.loads(recording.json.read_text())
-            self.assertLess(document["dropped"], document["frames"])
             self.assertEqual(streams["recordingRegion"][-1].value, (0, 0, 1280, 720))
             colours = self.colour_of_strip(recording, (200, 20))
             self.assertEqual((colours[0], colours[-1]), (0, 1))
