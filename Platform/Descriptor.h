@@ -4,6 +4,8 @@
 // signals do not cut short. Every failure is a `std::system_error` that says what could not be done, but not to which
 // file.
 
+#include "SharedDependencies/Export.h"
+
 #include <cerrno>
 #include <cstddef>
 #include <cstdint>
@@ -29,7 +31,7 @@ inline std::string atOffset(std::uint64_t position) {
     return " at offset " + std::to_string(position);
 }
 
-class Descriptor {
+class ZULMETADATA_API Descriptor {
 public:
     explicit Descriptor(int number) : number_(number) {}
     ~Descriptor() {

@@ -4,6 +4,7 @@
 
 #include "Platform/Descriptor.h"
 #include "Platform/FileLocation.h"
+#include "SharedDependencies/Export.h"
 
 #include <cstdint>
 
@@ -11,7 +12,7 @@ namespace ZULMetaData {
 
 /// Keeps out others who open the file this way as long as it lives. Readers are not disturbed. Every failure is a
 /// `std::system_error`, as with a `Descriptor`.
-class DurableFile : Descriptor {
+class ZULMETADATA_API DurableFile : Descriptor {
 public:
     /// Opens a file that exists, for reading and writing. Throws for anything but a regular file, and if another
     /// program holds it open this way.

@@ -34,6 +34,7 @@ Redaction hiding(const std::string& word) {
 
 constexpr double s_endless = std::numeric_limits<double>::infinity();
 const double s_directlyAfter2 = std::nextafter(2.0, 3.0);
+const double s_directlyAfter10 = std::nextafter(10.0, 11.0);
 
 Redaction within(double from, double to) {
     Redaction redaction;
@@ -97,6 +98,18 @@ TEST(StreamRedaction, CarriesAStateOverTheRangeThatRemovedIt) {
               before + pointEntry(9, 4, 4))
         << "what was in force before still is";
     EXPECT_EQ(redacted(before + pointEntry(1, 2, 2), within(1, s_endless)).bytes, before) << "nothing is left";
+}
+
+TEST(StreamRedaction, CarriesAStateFromOneRangeToTheNext) {
+    const std::string before = streamHeader(s_cursorLocations, 1, 16) + pointEntry(0, 1, 1);
+    Redaction redaction = within(1, 2);
+    redaction.removedTimes.push_back({4, 10});
+    EXPECT_EQ(redacted(before + pointEntry(1, 2, 2) + pointEntry(5, 3, 3) + pointEntry(11, 4, 4), redaction).bytes,
+              before + pointEntry(s_directlyAfter2, 2, 2) + pointEntry(s_directlyAfter10, 3, 3) + pointEntry(11, 4, 4));
+    redaction.removedTimes.push_back({s_directlyAfter2, 3});
+    EXPECT_EQ(redacted(before + pointEntry(1, 2, 2) + pointEntry(2.5, 5, 5) + pointEntry(11, 4, 4), redaction).bytes,
+              before + pointEntry(std::nextafter(3, s_endless), 5, 5) + pointEntry(11, 4, 4))
+        << "there is no time between the first two";
 }
 
 TEST(StreamRedaction, CarriesNoEvent) {

@@ -78,6 +78,7 @@ void Camera::resume(Instant instant) {
     const std::lock_guard lock(mutex_);
     if (!pausedAt_)
         return;
+    dropTicksBefore(*pausedAt_);
     paused_ += instant - *pausedAt_;
     pausedAt_.reset();
     resumedAt_ = instant;
@@ -121,10 +122,8 @@ void Camera::giveUp(const std::string& why) {
 
 void Camera::takePictures() {
     try {
-        while (waitForTick()) {
-            serveTick();
-            skipMissedTicks();
-        }
+        while (waitForTick())
+            skipMissedTicks(serveTick());
     } catch (const std::exception& error) {
         giveUp(error.what());
     }
@@ -153,12 +152,14 @@ bool Camera::isBehind() const {
     return queue_.size() >= s_queuedPictures || (!queue_.empty() && now() - queue_.front().instant > s_longestInQueue);
 }
 
-void Camera::serveTick() {
+/// Returns when the tick was due.
+Instant Camera::serveTick() {
     bool isFull = false;
     Instant due = 0;
     {
         const std::lock_guard lock(mutex_);
         due = nextTick_;
+        serving_ = due;
         isFull = isBehind();
     }
     const std::optional<GrabbedPicture> grabbed = isFull ? grabber_.askPointer() : grabber_.grab();
@@ -169,13 +170,14 @@ void Camera::serveTick() {
         events_.sawPointer(grabbed->pointerInstant, grabbed->pointer);
     if (!time) {
         countDropped(due); // even if the end has come before its pixels
-        return;
+        return due;
     }
     Picture picture{converted(*grabbed), *time, grabbed->instant};
     const std::lock_guard lock(mutex_);
     queue_.push_back(std::move(picture));
     ++taken_;
     changed_.notify_all();
+    return due;
 }
 
 /// Counts a tick without a frame, if it is one of the recording.
@@ -207,14 +209,25 @@ std::optional<std::int64_t> Camera::movieTime(Instant instant) {
     return time;
 }
 
-void Camera::skipMissedTicks() {
+void Camera::skipMissedTicks(Instant served) {
     const std::lock_guard lock(mutex_);
+    serving_.reset();
+    if (served < resumedAt_) // a pause has begun and ended meanwhile, so the next tick is the first one after it
+        return;
     nextTick_ = tick(++ticks_);
     if (!zero_)
         return;
     const Instant present = now();
     const Instant end = std::min({present, pausedAt_.value_or(present), stopAt_.value_or(present)});
     for (; tick(ticks_ + 1) <= end; nextTick_ = tick(++ticks_)) // the one before has passed whole
+        ++dropped_;
+}
+
+/// Counts the ticks before a pause that nobody has served when it ends.
+void Camera::dropTicksBefore(Instant instant) {
+    if (serving_ == nextTick_) // this one is counted when it is served
+        nextTick_ = tick(++ticks_);
+    for (; nextTick_ < instant; nextTick_ = tick(++ticks_))
         ++dropped_;
 }
 

@@ -66,11 +66,12 @@ private:
 
     void takePictures();
     void encodePictures();
-    void serveTick();
+    Instant serveTick();
     bool isBehind() const;
     void countDropped(Instant due);
     bool waitForTick();
-    void skipMissedTicks();
+    void skipMissedTicks(Instant served);
+    void dropTicksBefore(Instant instant);
     void countTicksFrom(Instant instant);
     Instant tick(std::int64_t number) const;
     FramePointer emptyPicture();
@@ -96,6 +97,7 @@ private:
     Instant firstTick_ = 0;
     std::int64_t ticks_ = 0; ///< after the first one
     Instant nextTick_ = 0;
+    std::optional<Instant> serving_; ///< the tick that has no frame yet and is not counted
     std::int64_t lastTime_ = -1;
     bool isOver_ = false; ///< no picture comes any more
     std::string error_;

@@ -34,12 +34,11 @@ constexpr std::array s_words{Word{Command::Pause, "pause"}, Word{Command::Resume
 
 /// The folder that belongs to the user as long as he is logged in, or one in its place.
 fs::path runtimeFolder() {
-    if (const char* folder = std::getenv("XDG_RUNTIME_DIR"); folder && *folder)
-        return folder;
-    fs::path usual = fmt::format("/run/user/{}", getuid());
+    const char* named = std::getenv("XDG_RUNTIME_DIR");
     std::error_code error;
-    if (fs::is_directory(usual, error))
-        return usual;
+    for (const fs::path& folder : {fs::path(named ? named : ""), fs::path(fmt::format("/run/user/{}", getuid()))})
+        if (fs::is_directory(folder, error))
+            return folder;
     return fs::temp_directory_path() / fmt::format("zulm-record-{}", getuid());
 }
 
@@ -68,8 +67,14 @@ int connectTo(const FileHandle& handle, const fs::path& path) {
     return connect(handle.get(), reinterpret_cast<const sockaddr*>(&address), sizeof(address)) == 0 ? 0 : errno;
 }
 
-FileHandle newSocket() {
-    return FileHandle(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0));
+FileHandle newSocket(int flags = 0) {
+    return FileHandle(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | flags, 0));
+}
+
+/// Returns 0 if somebody listens, or the number of the error. Does not wait for one that has stopped.
+int tryToReach(const fs::path& path) {
+    const int error = connectTo(newSocket(SOCK_NONBLOCK), path);
+    return error == EAGAIN ? 0 : error;
 }
 
 /// Returns a connection, or an empty handle if nobody listens.
@@ -83,8 +88,7 @@ bool isAbandoned(const fs::path& path) {
     std::error_code error;
     if (fs::symlink_status(path, error).type() != fs::file_type::socket)
         return false;
-    const FileHandle handle = newSocket();
-    return connectTo(handle, path) == ECONNREFUSED;
+    return tryToReach(path) == ECONNREFUSED;
 }
 
 std::vector<fs::path> socketsOf(const fs::path& folder) {
@@ -92,7 +96,7 @@ std::vector<fs::path> socketsOf(const fs::path& folder) {
     std::error_code error;
     for (const fs::directory_entry& entry : fs::directory_iterator(folder, error)) {
         const std::string name = entry.path().filename().string();
-        if (name.starts_with(s_prefix) && name.ends_with(s_suffix) && connectionTo(entry.path()))
+        if (name.starts_with(s_prefix) && name.ends_with(s_suffix) && tryToReach(entry.path()) == 0)
             sockets.push_back(entry.path());
     }
     return sockets;
@@ -122,7 +126,7 @@ ControlSocket::ControlSocket(const fs::path& path) : path_(path) {
     } else if (isAbandoned(path_)) {
         unlink(path_.c_str());
     }
-    listener_ = FileHandle(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0));
+    listener_ = newSocket(SOCK_NONBLOCK);
     const sockaddr_un address = addressOf(path_);
     const mode_t mask = umask(0177);
     const bool isBound = bind(listener_.get(), reinterpret_cast<const sockaddr*>(&address), sizeof(address)) == 0;

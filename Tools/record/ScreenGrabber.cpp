@@ -17,6 +17,7 @@ namespace Recorder {
 namespace {
 
 constexpr std::uint32_t s_allPlanes = 0xffffffff;
+constexpr std::uint8_t s_noPixel = 0;
 
 const xcb_format_t* formatOfDepth(const xcb_setup_t& setup, std::uint8_t depth) {
     for (auto formats = xcb_setup_pixmap_formats_iterator(&setup); formats.rem > 0; xcb_format_next(&formats))
@@ -48,7 +49,7 @@ std::optional<PixelLayout> layoutOf(int bitsPerPixel, const xcb_visualtype_t& vi
 } // namespace
 
 ScreenGrabber::ScreenGrabber(const std::string& display, Area area, xcb_window_t window)
-    : connection_(display), area_(area), window_(window) {
+    : connection_(display), area_(area), window_(window), screen_(connection_.rootArea()) {
     findLayout();
     if (window_ != XCB_WINDOW_NONE) {
         xcb_composite_redirect_window(connection_.get(), window_, XCB_COMPOSITE_REDIRECT_AUTOMATIC);
@@ -139,6 +140,8 @@ bool ScreenGrabber::notePointer(xcb_query_pointer_cookie_t cookie, GrabbedPictur
 
 /// Returns null if the server does not know the pixels.
 const std::uint8_t* ScreenGrabber::fetch(xcb_drawable_t source, const Area& part) {
+    if (part.width == 0 || part.height == 0)
+        return &s_noPixel;
     xcb_connection_t* connection = connection_.get();
     const auto x = static_cast<std::int16_t>(part.x);
     const auto y = static_cast<std::int16_t>(part.y);
@@ -175,9 +178,7 @@ std::optional<GrabbedPicture> ScreenGrabber::grab() {
     const xcb_drawable_t source = drawable();
     if (source == XCB_NONE)
         return repeatLast();
-    Area part = area_;
-    if (pixmapArea_)
-        part = {0, 0, std::min(area_.width, pixmapArea_->width), std::min(area_.height, pixmapArea_->height)};
+    const Area part = partOf(pixmapArea_ ? *pixmapArea_ : screen_);
     GrabbedPicture picture;
     picture.bytesPerLine = bytesPerLine_;
     const Instant asked = now();
@@ -186,17 +187,25 @@ std::optional<GrabbedPicture> ScreenGrabber::grab() {
     picture.pixels = fetch(source, part);
     picture.instant = middleOf(asked, now());
     notePointer(pointerCookie, picture);
+    const bool isWhole = part.width == area_.width && part.height == area_.height;
+    if (!picture.pixels || !isWhole)
+        screen_ = connection_.rootArea(); // it may have changed
     if (!picture.pixels)
-        return std::nullopt;
-    if (part.width < area_.width || part.height < area_.height)
+        return picture;
+    if (!isWhole)
         picture.pixels = padded(picture.pixels, part);
     lastPixels_ = picture.pixels;
     return picture;
 }
 
+/// Returns which part of the area there is in a picture of the screen or of the window.
+Area ScreenGrabber::partOf(const Area& source) const {
+    const int x = window_ == XCB_WINDOW_NONE ? area_.x : 0;
+    const int y = window_ == XCB_WINDOW_NONE ? area_.y : 0;
+    return {x, y, std::clamp(source.width - x, 0, area_.width), std::clamp(source.height - y, 0, area_.height)};
+}
+
 std::optional<GrabbedPicture> ScreenGrabber::repeatLast() {
-    if (!lastPixels_)
-        return std::nullopt;
     std::optional<GrabbedPicture> picture = askPointer();
     if (picture) {
         picture->pixels = lastPixels_;

@@ -17,7 +17,7 @@ namespace Recorder {
 
 /// Pixels as the server hands them out, valid until the next picture.
 struct GrabbedPicture {
-    const std::uint8_t* pixels = nullptr;
+    const std::uint8_t* pixels = nullptr; ///< null if they cannot be read now
     int bytesPerLine = 0;
     Instant instant = 0; ///< the middle between the request and the arrival
     bool hasPointer = false;
@@ -39,8 +39,9 @@ public:
 
     PixelLayout layout() const { return layout_; }
 
-    /// Takes a picture. A window that is hidden shows its last picture, and one that became smaller has black at its
-    /// right and below it. Returns nothing if the area cannot be read now, such as a window that was never shown.
+    /// Takes a picture. A window that is hidden shows its last picture. A window or screen that became smaller has
+    /// black at its right and below it. The picture has no pixels if the area cannot be read now, such as a window that
+    /// was never shown. Returns nothing if the server knows nothing of the pointer either.
     std::optional<GrabbedPicture> grab();
 
     /// Asks for the pointer alone.
@@ -53,6 +54,7 @@ private:
     void shareMemory();
     xcb_drawable_t drawable();
     int bytesPerLineOf(int width) const;
+    Area partOf(const Area& source) const;
     const std::uint8_t* fetch(xcb_drawable_t source, const Area& part);
     const std::uint8_t* padded(const std::uint8_t* pixels, const Area& part);
     std::optional<GrabbedPicture> repeatLast();
@@ -61,6 +63,7 @@ private:
     XConnection connection_;
     Area area_;
     xcb_window_t window_;
+    Area screen_;                    ///< its size, as far as pictures have shown
     xcb_pixmap_t pixmap_ = 0;        ///< what the window shows, even where others cover it
     std::optional<Area> pixmapArea_; ///< nothing while the window has no pixmap
     PixelLayout layout_ = PixelLayout::BGRX32;

@@ -28,6 +28,7 @@ constexpr double s_tolerance = s_soundRate / 100.0;
 constexpr double s_smoothing = 64; ///< blocks
 constexpr Instant s_longestOpening = 5 * s_second;
 constexpr Instant s_longestTurn = 50 * s_millisecond;
+constexpr Instant s_longestTail = 500 * s_millisecond; ///< for sound that is on its way when the recording ends
 constexpr Instant s_microsecond = 1000;
 
 } // namespace
@@ -109,7 +110,7 @@ SoundSource::SoundSource(const std::string& source) : stream_(std::make_unique<S
 }
 
 SoundSource::~SoundSource() {
-    stop();
+    stop(0);
 }
 
 void SoundSource::start(const Camera& camera, VideoWriter& writer, std::function<void(const std::string&)> failed) {
@@ -122,15 +123,16 @@ void SoundSource::start(const Camera& camera, VideoWriter& writer, std::function
     });
 }
 
-void SoundSource::stop() {
-    isOver_ = true;
+void SoundSource::stop(Instant end) {
+    end_ = end;
     if (thread_.joinable())
         thread_.join();
 }
 
 void SoundSource::record(const Camera& camera, VideoWriter& writer) {
     std::vector<float> block;
-    while (!isOver_) {
+    Instant last = 0;
+    while (last < end_ && now() - s_longestTail < end_) {
         if (!stream_->turn())
             throw Failure(fmt::format("the sound has ended: {}", stream_->error()), ExitLoss);
         const void* bytes = nullptr;
@@ -138,6 +140,7 @@ void SoundSource::record(const Camera& camera, VideoWriter& writer) {
         while (pa_stream_readable_size(stream_->stream.get()) > 0 &&
                pa_stream_peek(stream_->stream.get(), &bytes, &size) >= 0 && size > 0) {
             const std::optional<Instant> heard = stream_->heard();
+            last = heard.value_or(last);
             if (bytes) { // otherwise the server has left something out
                 const auto* samples = static_cast<const float*>(bytes);
                 block.assign(samples, samples + size / sizeof(float));

@@ -8,6 +8,7 @@
 #include <atomic>
 #include <cstdint>
 #include <functional>
+#include <limits>
 #include <memory>
 #include <span>
 #include <string>
@@ -26,8 +27,8 @@ public:
     /// Writes what is heard from the first frame on. `failed` is called on the thread if that ends early.
     void start(const Camera& camera, VideoWriter& writer, std::function<void(const std::string& why)> failed);
 
-    /// Ends the thread.
-    void stop();
+    /// Writes what is heard before `end`, and ends the thread.
+    void stop(Instant end);
 
 private:
     struct Stream; ///< from the sound server
@@ -39,7 +40,7 @@ private:
     std::unique_ptr<Stream> stream_;
     std::int64_t written_ = 0; ///< samples of each channel
     double missing_ = 0;       ///< samples that are missing at the present time, smoothed; fewer than 0 are too many
-    std::atomic<bool> isOver_ = false;
+    std::atomic<Instant> end_ = std::numeric_limits<Instant>::max();
     std::thread thread_;
 };
 

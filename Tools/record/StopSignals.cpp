@@ -1,16 +1,18 @@
 #include "Tools/record/StopSignals.h"
 
+#include <poll.h>
+#include <sys/eventfd.h>
 #include <sys/signalfd.h>
+#include <unistd.h>
 
+#include <array>
 #include <csignal>
-#include <cstring>
+#include <cstdint>
 #include <string>
 
 namespace Recorder {
 
 namespace {
-
-std::string s_lastWords; // of a process that a signal ends
 
 sigset_t stopSet() {
     sigset_t set;
@@ -20,44 +22,80 @@ sigset_t stopSet() {
     return set;
 }
 
-/// Called while the process is interrupted, so nothing may be allocated.
-[[noreturn]] void endNow(int number) {
-    constexpr int signalled = 128;
-    [[maybe_unused]] const auto written = ::write(STDERR_FILENO, s_lastWords.data(), s_lastWords.size());
-    _exit(signalled + number);
+FileHandle newEvent() {
+    return FileHandle(eventfd(0, EFD_CLOEXEC | EFD_NONBLOCK));
+}
+
+void raiseEvent(const FileHandle& event) {
+    const std::uint64_t one = 1;
+    [[maybe_unused]] const auto written = write(event.get(), &one, sizeof(one));
 }
 
 } // namespace
 
-StopSignals::StopSignals() {
+StopSignals::StopSignals() : arrived_(newEvent()), over_(newEvent()) {
     const sigset_t set = stopSet();
     pthread_sigmask(SIG_BLOCK, &set, nullptr);
     std::signal(SIGPIPE, SIG_IGN);
     std::signal(SIGXFSZ, SIG_IGN); // a write then fails instead
-    handle_ = FileHandle(signalfd(-1, &set, SFD_CLOEXEC | SFD_NONBLOCK));
+    signals_ = FileHandle(signalfd(-1, &set, SFD_CLOEXEC | SFD_NONBLOCK));
+    thread_ = std::thread([this] { watch(); });
+}
+
+StopSignals::~StopSignals() {
+    raiseEvent(over_);
+    thread_.join();
+}
+
+void StopSignals::watch() {
+    std::array<pollfd, 2> waits{pollfd{signals_.get(), POLLIN, 0}, pollfd{over_.get(), POLLIN, 0}};
+    while (waits[1].revents == 0) {
+        signalfd_siginfo info{};
+        while (read(signals_.get(), &info, sizeof(info)) == sizeof(info))
+            take({static_cast<int>(info.ssi_signo), info.ssi_code == SI_KERNEL});
+        poll(waits.data(), waits.size(), -1);
+    }
+}
+
+void StopSignals::take(const Signal& signal) {
+    const std::lock_guard lock(mutex_);
+    if (signal.number != SIGUSR1) {
+        if (endsAtNext_)
+            endProcess(signal.number);
+        endsAtNext_ = true;
+    }
+    queue_.push_back(signal);
+    raiseEvent(arrived_);
 }
 
 std::optional<StopSignals::Signal> StopSignals::next() {
-    signalfd_siginfo info{};
-    if (read(handle_.get(), &info, sizeof(info)) != sizeof(info))
+    const std::lock_guard lock(mutex_);
+    if (queue_.empty()) {
+        std::uint64_t count = 0;
+        [[maybe_unused]] const auto taken = read(arrived_.get(), &count, sizeof(count));
         return std::nullopt;
-    return Signal{static_cast<int>(info.ssi_signo), info.ssi_code == SI_KERNEL};
+    }
+    const Signal signal = queue_.front();
+    queue_.pop_front();
+    return signal;
 }
 
-void StopSignals::endAtOnce(int number, const std::filesystem::path& folder) {
-    s_lastWords = folder.string() + "\n";
-    endNow(number);
+void StopSignals::nameFolder(const std::filesystem::path& folder) {
+    const std::lock_guard lock(mutex_);
+    folder_ = folder;
 }
 
-void StopSignals::endAtNext(const std::filesystem::path& folder) {
-    s_lastWords = folder.string() + "\n";
-    struct sigaction action {};
-    action.sa_handler = endNow;
-    for (const int number : {SIGINT, SIGTERM, SIGHUP})
-        sigaction(number, &action, nullptr);
-    std::signal(SIGUSR1, SIG_IGN);
-    const sigset_t set = stopSet();
-    pthread_sigmask(SIG_UNBLOCK, &set, nullptr);
+void StopSignals::endAtNext() {
+    const std::lock_guard lock(mutex_);
+    endsAtNext_ = true;
+}
+
+/// Other threads go on meanwhile, so nothing of theirs may be destroyed.
+void StopSignals::endProcess(int number) const {
+    constexpr int signalled = 128;
+    const std::string lastWords = folder_.empty() ? "" : folder_.string() + "\n";
+    [[maybe_unused]] const auto written = write(STDERR_FILENO, lastWords.data(), lastWords.size());
+    _exit(signalled + number);
 }
 
 } // namespace Recorder

@@ -2,34 +2,52 @@
 
 #include "Tools/record/FileHandle.h"
 
+#include <deque>
 #include <filesystem>
+#include <mutex>
 #include <optional>
+#include <thread>
 
 namespace Recorder {
 
-/// Takes SIGINT, SIGTERM, SIGHUP and SIGUSR1 as descriptors are taken, for all threads that are started later.
+/// Takes SIGINT, SIGTERM, SIGHUP and SIGUSR1 as descriptors are taken, for all threads that are started later. The
+/// second signal to end ends the process, even if the recorder waits for something that never comes.
 class StopSignals {
 public:
     StopSignals();
+    ~StopSignals();
+    StopSignals(const StopSignals&) = delete;
+    StopSignals& operator=(const StopSignals&) = delete;
 
     struct Signal {
         int number;
         bool isFromTerminal; ///< a key made it
     };
 
-    int descriptor() const { return handle_.get(); }
+    int descriptor() const { return arrived_.get(); }
 
     /// Returns the next signal that has arrived.
     std::optional<Signal> next();
 
-    /// Ends the process, and the name of the folder is the last that it says.
-    [[noreturn]] static void endAtOnce(int number, const std::filesystem::path& folder);
+    /// A process that is ended by a signal says the name of this folder last, unless it is empty.
+    void nameFolder(const std::filesystem::path& folder);
 
-    /// From now on a signal ends the process at once, and the name of the folder is the last that it says.
-    void endAtNext(const std::filesystem::path& folder);
+    /// From now on the first signal to end ends the process.
+    void endAtNext();
 
 private:
-    FileHandle handle_;
+    void watch();
+    void take(const Signal& signal);
+    [[noreturn]] void endProcess(int number) const;
+
+    FileHandle signals_;
+    FileHandle arrived_; ///< readable while there are signals to take
+    FileHandle over_;    ///< readable when the thread is to end
+    std::mutex mutex_;
+    std::deque<Signal> queue_;
+    std::filesystem::path folder_;
+    bool endsAtNext_ = false;
+    std::thread thread_;
 };
 
 } // namespace Recorder

@@ -29,18 +29,31 @@ WindowObserver::WindowObserver(XConnection& connection, const ServerClock& clock
                                PrivacyFilter& privacy, std::function<void(Instant, std::uint32_t)> changed)
     : connection_(connection), clock_(clock), journal_(journal), privacy_(privacy), changed_(std::move(changed)),
       activeWindowAtom_(connection.atom("_NET_ACTIVE_WINDOW")), supportedAtom_(connection.atom("_NET_SUPPORTED")),
-      nameAtom_(connection.atom("_NET_WM_NAME")), processAtom_(connection.atom("_NET_WM_PID")) {
+      managerAtom_(connection.atom("_NET_SUPPORTING_WM_CHECK")), nameAtom_(connection.atom("_NET_WM_NAME")),
+      processAtom_(connection.atom("_NET_WM_PID")) {
     const std::uint32_t events =
         XCB_EVENT_MASK_PROPERTY_CHANGE | XCB_EVENT_MASK_SUBSTRUCTURE_NOTIFY | XCB_EVENT_MASK_STRUCTURE_NOTIFY;
     xcb_change_window_attributes(connection_.get(), connection_.root(), XCB_CW_EVENT_MASK, &events);
     follow(now());
 }
 
+/// Returns the window by which a window manager shows that it runs. Its other properties stay when it has gone.
+xcb_window_t WindowObserver::managerWindow() const {
+    const auto named = connection_.numbers(connection_.root(), managerAtom_);
+    if (named.empty())
+        return XCB_NONE;
+    const std::uint32_t itsEnd = XCB_EVENT_MASK_STRUCTURE_NOTIFY;
+    xcb_change_window_attributes(connection_.get(), named.front(), XCB_CW_EVENT_MASK, &itsEnd);
+    return connection_.numbers(named.front(), managerAtom_) == named ? named.front() : xcb_window_t{XCB_NONE};
+}
+
 /// Whether a window manager says which window is active.
 bool WindowObserver::isManaged() {
     if (!isManaged_) {
+        manager_ = managerWindow();
         const auto supported = connection_.numbers(connection_.root(), supportedAtom_);
-        isManaged_ = std::find(supported.begin(), supported.end(), activeWindowAtom_) != supported.end();
+        isManaged_ =
+            manager_ != XCB_NONE && std::find(supported.begin(), supported.end(), activeWindowAtom_) != supported.end();
     }
     return *isManaged_;
 }
@@ -186,9 +199,10 @@ void WindowObserver::readArea(Instant instant) {
 void WindowObserver::propertyChanged(const xcb_property_notify_event_t& event) {
     const Instant instant = clock_.instantOf(event.time);
     if (event.window == connection_.root()) {
-        if (event.atom == supportedAtom_)
+        const bool isOfManager = event.atom == supportedAtom_ || event.atom == managerAtom_;
+        if (isOfManager)
             isManaged_.reset();
-        if (event.atom == supportedAtom_ || event.atom == activeWindowAtom_)
+        if (isOfManager || event.atom == activeWindowAtom_)
             follow(instant);
     } else if (event.window == client_) {
         if (event.atom == nameAtom_ || event.atom == XCB_ATOM_WM_NAME || event.atom == XCB_ATOM_WM_CLASS)
@@ -205,6 +219,10 @@ void WindowObserver::configured(const xcb_configure_notify_event_t& event) {
 }
 
 void WindowObserver::destroyed(xcb_window_t window) {
+    if (window == manager_) {
+        isManaged_.reset();
+        follow(now());
+    }
     if (window != client_ && window != frame_ && window != active_)
         return;
     client_ = frame_ = XCB_NONE;

@@ -43,6 +43,7 @@ public:
     bool getsKeys();
 
 private:
+    xcb_window_t managerWindow() const;
     bool isManaged();
     xcb_window_t inputFocus() const;
     xcb_window_t focusedWindow() const;
@@ -63,9 +64,11 @@ private:
     std::function<void(Instant, std::uint32_t)> changed_;
     xcb_atom_t activeWindowAtom_;
     xcb_atom_t supportedAtom_;
+    xcb_atom_t managerAtom_;
     xcb_atom_t nameAtom_;
     xcb_atom_t processAtom_;
-    std::optional<bool> isManaged_;  ///< a window manager names the active window
+    std::optional<bool> isManaged_; ///< a window manager names the active window
+    xcb_window_t manager_ = XCB_NONE;
     xcb_window_t active_ = XCB_NONE; ///< as the window manager or the focus says
     xcb_window_t client_ = XCB_NONE; ///< the window of the application
     xcb_window_t frame_ = XCB_NONE;  ///< the child of the root window around it

@@ -31,7 +31,11 @@ constexpr TimeRole roleOf() {
     return std::same_as<typename Kind::Value, std::string> ? TimeRole::Text : TimeRole::State;
 }
 
-/// The times that a redaction removes, as ranges that neither overlap nor touch.
+double directlyAfter(double time) {
+    return std::nextafter(time, std::numeric_limits<double>::infinity());
+}
+
+/// The times that a redaction removes, as ranges with a time between each two.
 class RemovedTimes {
 public:
     explicit RemovedTimes(std::vector<TimeRange> ranges) {
@@ -39,7 +43,7 @@ public:
         std::sort(ranges.begin(), ranges.end(),
                   [](const auto& left, const auto& right) { return left.from < right.from; });
         for (const TimeRange& range : ranges) {
-            if (!ranges_.empty() && range.from <= ranges_.back().to)
+            if (!ranges_.empty() && range.from <= directlyAfter(ranges_.back().to))
                 ranges_.back().to = std::max(ranges_.back().to, range.to);
             else
                 ranges_.push_back(range);
@@ -174,9 +178,16 @@ private:
         if constexpr (std::same_as<Value, CursorImage>)
             pictures_.remember(decoded.value, entry);
         if (s_role == TimeRole::State && range && std::isfinite(range->to))
-            carried_ = {std::nextafter(range->to, std::numeric_limits<double>::infinity()), decoded.value};
+            carryFrom(directlyAfter(range->to), decoded);
         ++result_.entriesRemoved;
         report(RedactedEntry::Removed, decoded.time, bytes);
+    }
+
+    /// Notes the value that holds when a removed range is over. That of an earlier range has held until this one.
+    void carryFrom(double time, const TimedValue<Value>& decoded) {
+        if (carried_ && carried_->time < time)
+            carryTo(decoded.time);
+        carried_ = {time, decoded.value};
     }
 
     /// Adds the value that the removed entries left behind, unless the entry at `time` takes its place.

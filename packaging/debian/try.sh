@@ -8,6 +8,14 @@ has_package() {
     dpkg-query -W -f='${Status}' "$1" 2>/dev/null | grep -q 'install ok installed'
 }
 
+for package in packages/*.deb; do
+    name=$(dpkg-deb --field "$package" Package)
+    if ! grep -q 'rights' "/usr/share/doc/$name/copyright"; then
+        echo "$name does not say who may use it" >&2
+        exit 1
+    fi
+done
+
 awk '/^```/ { inside = !inside && $0 == "```cpp"; next } inside' README.md >example.cpp
 g++ -std=c++20 example.cpp -lZULMetaDataSession -lZULMetaDataBridge -lZULMetaData -o example
 printf '\0\0\0\20ftypmp42\0\0\0\0' >Movie.mp4

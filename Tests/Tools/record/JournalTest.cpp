@@ -5,6 +5,7 @@
 
 #include <gtest/gtest.h>
 
+#include <span>
 #include <string>
 #include <utility>
 #include <vector>
@@ -63,6 +64,17 @@ TEST_F(JournalTest, KeepsAStateOfAPauseThatIsReadAfterIt) {
     journal_.resume(s_begin + 5 * s_second);
     move(5 * s_second - s_millisecond, 2);
     EXPECT_EQ(positions(), (Positions{{0, 1}, {1, 2}}));
+}
+
+TEST_F(JournalTest, LeavesEventsBeforeTheBeginningOut) {
+    click(-s_millisecond);
+    journal_.start(s_begin);
+    click(-s_millisecond);
+    click(0);
+    journal_.session().finish();
+    const Recording stream(folder_ / "a/cursorAction.dat");
+    const std::span<const double> times = stream.track<CursorActionKind>().times();
+    EXPECT_EQ(std::vector<double>(times.begin(), times.end()), std::vector<double>{0});
 }
 
 TEST_F(JournalTest, LeavesEventsOfAPauseOut) {

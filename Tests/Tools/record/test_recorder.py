@@ -136,6 +136,36 @@ class Files(Test):
             self.assertEqual(desk.record(wait=False).process.wait(20), 2)
             self.assertEqual(list(recording.folder.iterdir()), [])
 
+    def test_a_movie_that_appears_meanwhile_is_never_replaced(self):
+        with Desk(manager=None) as desk:
+            recording = desk.record()
+            recording.output.write_text("mine", encoding="utf-8")
+            self.assertEqual(recording.stop(), 3)
+            self.assertEqual(recording.output.read_text(encoding="utf-8"), "mine")
+            self.assertEqual(recording.errors().splitlines()[-1], str(recording.folder))
+            document = json.loads(recording.json.read_text())
+            self.assertEqual((document["movie"], document["folder"]), (None, str(recording.folder)))
+            other = desk.folder / "other.mp4"
+            result = subprocess.run([PROGRAMS["recorder"], "--recover", recording.folder, "-o", other], check=False,
+                                    capture_output=True)
+            self.assertEqual(result.returncode, 0, result.stderr)
+            self.assertEqual(len(frame_times(other)), document["frames"])
+
+    def test_nothing_is_written_elsewhere(self):
+        """The desk's folder is the home, the runtime and the working folder."""
+        with Desk(manager=None) as desk:
+            temporary = desk.folder / "temporary"
+            temporary.mkdir()
+            desk.environment["TMPDIR"] = str(temporary)
+            before = set(os.listdir(desk.folder))
+            recording = desk.record(*ALL_KEYS)
+            own = {recording.log.name, recording.json.name}
+            self.assertEqual(set(os.listdir(desk.folder)) - before - own,
+                             {recording.folder.name, recording.socket().name})
+            self.recorded(recording)
+            self.assertEqual(set(os.listdir(desk.folder)) - before - own, {recording.output.name})
+            self.assertEqual(os.listdir(temporary), [])
+
     def test_refusals_create_nothing(self):
         with Desk(manager=None) as desk:
             before = set(os.listdir(desk.folder))
@@ -159,6 +189,27 @@ class Files(Test):
             recording.process.send_signal(signal.SIGTERM)
             recording.process.send_signal(signal.SIGCONT)
             self.assertEqual(recording.process.wait(30), 128 + signal.SIGTERM)  # SIGINT has the lower number
+            self.assertEqual(recording.errors().splitlines()[-1], str(recording.folder))
+            self.assertTrue(recording.folder.exists())
+            self.assertFalse(recording.output.exists())
+
+
+    def test_a_second_signal_ends_it_though_the_display_hangs(self):
+        """The first one ends the recording, which waits for the picture that it has asked for. It has several attempts,
+        since it may not have asked for one yet."""
+        with Desk(manager=None) as desk:
+            for attempt in range(5):
+                recording = desk.record(name=f"{attempt}.mp4")
+                desk.server.send_signal(signal.SIGSTOP)
+                time.sleep(0.5)
+                recording.process.send_signal(signal.SIGTERM)
+                time.sleep(0.5)
+                if recording.process.poll() is None:
+                    break
+                desk.server.send_signal(signal.SIGCONT)
+            recording.process.send_signal(signal.SIGINT)
+            self.assertEqual(recording.process.wait(30), 128 + signal.SIGINT)
+            desk.server.send_signal(signal.SIGCONT)
             self.assertEqual(recording.errors().splitlines()[-1], str(recording.folder))
             self.assertTrue(recording.folder.exists())
             self.assertFalse(recording.output.exists())
@@ -232,6 +283,48 @@ class Picture(Test):
             times = frame_times(recording.output)
             gaps = [after - before for before, after in zip(times, times[1:])]
             self.assertLess(max(gaps), 1.5)  # it was hidden for 2 s
+
+    def test_the_window_that_is_clicked(self):
+        """A click that comes before the recorder waits for one goes to the window, so there are several attempts."""
+        with Desk() as desk:
+            desk.show(200, 100, 400, 300)
+            desk.show(700, 100, 300, 200)
+            desk.xdotool("mousemove", 400, 300)
+            recording = desk.record("--window", "click", "--without-accessibility", wait=False)
+
+            def is_recording():
+                desk.xdotool("click", 1)
+                time.sleep(0.5)
+                return "recording " in recording.errors()
+
+            desk.wait_for(is_recording)
+            streams = self.recorded(recording)
+            x, y, width, height = streams["recordingRegion"][0].value
+            self.assertTrue(x <= 200 and y <= 100 and x + width in range(600, 640) and y + height in range(400, 440),
+                            streams["recordingRegion"])
+
+    def test_a_screen_that_becomes_smaller_is_recorded_on(self):
+        if not shutil.which("xrandr"):
+            self.skipTest("there is no xrandr")
+        with Desk(manager=None) as desk:
+            window = desk.show(0, 0, 300, 200, managed=False)
+            recording = desk.record()
+            time.sleep(0.5)
+            sides = [number for side in (640, 480) for number in 4 * [str(side)]]
+            desk.run("xrandr", "--newmode", "small", "25", *sides)
+            desk.run("xrandr", "--addmode", "screen", "small")
+            desk.run("xrandr", "--output", "screen", "--mode", "small")
+            if "current 640 x 480" not in desk.run("xrandr"):
+                self.skipTest("this server has a screen of one size")
+            time.sleep(0.5)
+            desk.xdotool("mousemove", 100, 150, "click", 1)
+            desk.wait_for(lambda: window.lines("button"))
+            time.sleep(1)
+            streams = self.recorded(recording)
+            self.assertEqual(streams["recordingRegion"][-1].value, (0, 0, 1280, 720))
+            colours = self.colour_of_strip(recording, (200, 20))
+            self.assertEqual((colours[0], colours[-1]), (0, 1))
+            self.assertLess(max(pixels(recording.output, (1000, 600, 2, 2))[-1]), 16)
 
     def test_one_monitor(self):
         if not shutil.which("xrandr"):
@@ -433,6 +526,16 @@ class Keys(Test):
             self.assertEqual(keys, [(ord("é"), 0), (ord("@"), 0), (ord("ß"), 0), (ord("й"), 0),
                                     (ord("й"), CONTROL)])
 
+    def test_a_composed_key_has_the_time_of_the_key_that_completes_it(self):
+        with Desk(layout=["-layout", "de"]) as desk:
+            desk.run("xset", "r", "off")
+            desk.show()
+            recording = desk.record(*ALL_KEYS)
+            desk.xdotool("key", 38, "key", 21, "sleep", "0.7", "key", 26)  # a, a dead accent, e
+            a, composed = self.recorded(recording)["keyboardAction"]
+            self.assertEqual([a.value, composed.value], [(ord("a"), 0), (ord("é"), 0)])
+            self.assertGreaterEqual(composed.time - a.time, 0.7)
+
     def test_texts_of_two_layouts(self):
         texts = {"us": "The quick brown fox jumps over 13 lazy dogs, {twice}! It's 7 + 5 = 12; #4 & 'x' [is] ~99%? "
                        "abc-xyz/QWERTY.",
@@ -564,6 +667,21 @@ class Windows(Test):
             self.assertEqual(streams["topmostAppName"][0].value, "Café")
             self.assertEqual(streams["topmostWindowTitle"][0].value, "Wrong \ufffd\ufffd byte")
 
+    def test_a_title_has_the_time_of_its_property(self):
+        """However late the recorder reads it."""
+        with Desk() as desk:
+            window = desk.show()
+            recording = desk.record(*ALL_KEYS)
+            recording.process.send_signal(signal.SIGSTOP)
+            window.tell("title Second")
+            desk.wait_for(lambda: "Second" in desk.run("xprop", "-id", str(window.id), "_NET_WM_NAME"))
+            time.sleep(1)
+            desk.xdotool("key", "a")
+            recording.process.send_signal(signal.SIGCONT)
+            streams = self.recorded(recording)
+            self.assertEqual([entry.value for entry in streams["topmostWindowTitle"]], ["Shown Window", "Second"])
+            self.assertGreaterEqual(streams["keyboardAction"][0].time - streams["topmostWindowTitle"][1].time, 1)
+
     def test_the_old_name_of_a_window_counts_too(self):
         with Desk() as desk:
             window = desk.show()
@@ -580,6 +698,32 @@ class Windows(Test):
             self.assertEqual(streams["topmostWindowTitle"][-1].value, "Shown Window")
             self.assertEqual(streams["topmostWindow"][-1].value, (200, 100, 400, 300))
             self.assertEqual(streams["hoverRect"][-1].value, (200, 100, 400, 300), window.id)
+
+    def test_when_the_manager_has_gone_the_focus_counts(self):
+        """What it has said about the active window stays on the root window."""
+        with Desk(manager=None) as desk:
+            manager = desk.start(["openbox"])
+            desk.wait_for(lambda: "window id" in desk.run("xprop", "-root", "_NET_SUPPORTING_WM_CHECK"))
+            desk.show(500, 300, 400, 300)
+            recording = desk.record()
+            end(manager, signal.SIGKILL)
+            window = desk.show(100, 100, 300, 200, managed=False)
+            window.tell("title Focused")
+            desk.xdotool("mousemove", 200, 150, "windowfocus", window.id)
+            desk.wait_for(lambda: [entry.value for entry in recording.entries("topmostWindowTitle")][-1] == "Focused",
+                          20)
+            streams = self.recorded(recording)
+            self.assertEqual(streams["topmostWindow"][-1].value, (100, 100, 300, 200))
+
+    def test_each_pattern_counts(self):
+        with Desk() as desk:
+            window = desk.show()
+            recording = desk.record("--deny-title", "first", "--deny-title", "second")
+            for line in ("title First", "title Other", "title Second"):
+                window.tell(line)
+                time.sleep(0.3)
+            titles = [entry.value for entry in self.recorded(recording)["topmostWindowTitle"]]
+            self.assertEqual(titles, ["Shown Window", "", "Other", ""])
 
     def test_denied_windows_leave_no_title_and_no_key(self):
         with Desk() as desk:
@@ -708,6 +852,13 @@ class Control(Test):
             streams = self.recorded(recording)
             self.assertEqual([entry.value for entry in streams["cursorAction"]], [256, 1])
 
+    def test_a_runtime_folder_that_is_missing_is_not_made(self):
+        with Desk(manager=None) as desk:
+            desk.environment.update(XDG_RUNTIME_DIR=str(desk.folder / "absent"), TMPDIR=str(desk.folder))
+            recording = desk.record("--without-accessibility")
+            self.assertFalse((desk.folder / "absent").exists())
+            self.recorded(recording)
+
     def test_only_a_socket_that_was_left_is_replaced(self):
         with Desk(manager=None) as desk:
             path = desk.folder / "control"
@@ -767,6 +918,18 @@ class Control(Test):
             self.assertEqual(document["stopped_by"], "signal")
             begun, paused, resumed, ended = instants
             self.assert_near(document["duration"], paused - begun + ended - resumed, 0.6)
+
+    def test_every_tick_beside_a_pause_is_counted(self):
+        with Desk(manager=None) as desk:
+            recording = desk.record("--without-accessibility")
+            for seconds in (0.5, 0.3):
+                time.sleep(seconds)
+                recording.process.send_signal(signal.SIGUSR1)
+            self.recorded(recording)
+            document = json.loads(recording.json.read_text())
+            ticks = document["frames"] + document["dropped"]
+            self.assertGreaterEqual(ticks, document["duration"] * 30 - 0.01)
+            self.assertLess(ticks, document["duration"] * 30 + 2)  # each part ends inside of a tick
 
     def test_one_of_several_recorders(self):
         with Desk(manager=None) as desk:
@@ -881,6 +1044,19 @@ class Loss(Test):
             recording = desk.record()
             self.assertEqual([entry.value for entry in recording.entries("cursorAction")], [256])
             self.recorded(recording)
+
+    def test_a_disk_that_is_full_at_the_start(self):
+        with tempfile.TemporaryDirectory() as place, Desk(manager=None) as desk:
+            if "permission" in desk.run("mount", "-t", "tmpfs", "-o", "size=3m", "tmpfs", place):
+                self.skipTest("no file system may be mounted here")
+            try:
+                result = subprocess.run([PROGRAMS["recorder"], "-o", place + "/out.mp4"], check=False,
+                                        env=desk.environment, capture_output=True, text=True, timeout=30)
+                self.assertEqual(result.returncode, 1, result.stderr)
+                self.assertIn("too little space", result.stderr)
+                self.assertEqual(os.listdir(place), [])
+            finally:
+                desk.run("umount", "-l", place)
 
     def test_a_recording_of_a_hidden_window_is_recovered(self):
         with Desk(manager=None) as desk:

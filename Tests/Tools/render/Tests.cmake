@@ -7,6 +7,8 @@ if(ZULMETADATA_RENDERER)
   zulm_add_tests(RendererTests JsonFieldsTest KeyCapsTest OptionsTest RedactionsTest SoundTrackTest StageTest StyleTest
     TimeMapTest)
   target_link_libraries(RendererTests PRIVATE zulm_render_parts)
+  # The libraries that draw are compiled against with -pthread, the precompiled headers without.
+  set_target_properties(RendererTests PROPERTIES DISABLE_PRECOMPILE_HEADERS ON)
 endif()
 # Each suite of the script is a test. They are skipped if the renderer is not built.
 foreach(suite IN ITEMS Marker Sound Styles Captions Cursor Outputs Hostile Redaction Golden Guide)
