@@ -72,11 +72,12 @@ private:
         if (isPipe)
             throwReason(EINVAL, "cannot be opened");
         buffer_.pubsetbuf(nullptr, 0);
+        bool isOpen = false;
         do {
             errno = 0;
-            buffer_.open(path, std::ios_base::in | std::ios_base::binary);
-        } while (!buffer_.is_open() && errno == EINTR);
-        if (!buffer_.is_open())
+            isOpen = buffer_.open(path, std::ios_base::in | std::ios_base::binary) != nullptr;
+        } while (!isOpen && errno == EINTR);
+        if (!isOpen)
             throwReason(errno, "cannot be opened");
     }
 
