@@ -121,8 +121,8 @@ void AccessibilityProcess::take(const std::string& line, const AccessibilityEven
     } else if (what == "answer" && asked_) {
         words >> focus;
         const Instant asked = *std::exchange(asked_, std::nullopt);
-        if (askedWindow_ == windows_ && focus != "late")
-            events.answer(asked, focusOf(focus));
+        if (askedWindow_ == windows_)
+            events.answer(asked, focus == "late" ? std::nullopt : std::optional(focusOf(focus)));
     } else if (what == "rect" && askedHover_) {
         askedHover_.reset();
         const bool isKnown = static_cast<bool>(words >> area.x >> area.y >> area.width >> area.height);

@@ -19,8 +19,9 @@ namespace Recorder {
 /// What the process reports.
 struct AccessibilityEvents {
     std::function<void(std::uint32_t process, Focus focus)> focus; ///< of an application has changed
-    std::function<void(Instant asked, Focus focus)> answer;        ///< to a question about the focus
-    std::function<void(const std::optional<Area>& area)> hover;    ///< what the pointer is over, if the bus knows
+    /// To a question about the focus. There is nothing if the application did not answer in time.
+    std::function<void(Instant asked, std::optional<Focus> focus)> answer;
+    std::function<void(const std::optional<Area>& area)> hover; ///< what the pointer is over, if the bus knows
 };
 
 class AccessibilityProcess {

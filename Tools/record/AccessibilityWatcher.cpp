@@ -68,7 +68,7 @@ std::uint32_t processOf(AtspiAccessible* accessible) {
     return atspi_accessible_get_process_id(accessible, nullptr);
 }
 
-/// An application that has no time says nothing of the focus: keys wait for the next answer.
+/// Said of an application that does not answer in time: keys wait for the next answer.
 constexpr const char* s_late = "late";
 
 const char* kindOf(AtspiAccessible* accessible) {
@@ -252,8 +252,7 @@ bool Watcher::stillHasFocus() {
     return hasState(focus_.get(), ATSPI_STATE_FOCUSED);
 }
 
-/// What the library has kept of earlier searches does not change with the application, since no event of it is asked
-/// for but those of the focus.
+/// The library's cache is out of date, because the application is asked for events of the focus alone.
 void Watcher::searchFocus() {
     focusProcess_ = process_;
     const Object<AtspiAccessible> application = applicationOf(process_);

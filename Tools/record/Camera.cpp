@@ -223,7 +223,7 @@ void Camera::skipMissedTicks(Instant served) {
         ++dropped_;
 }
 
-/// Counts the ticks before a pause that nobody has served when it ends.
+/// Counts the ticks before a pause that were not served when it ends.
 void Camera::dropTicksBefore(Instant instant) {
     if (serving_ == nextTick_) // this one is counted when it is served
         nextTick_ = tick(++ticks_);

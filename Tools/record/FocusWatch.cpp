@@ -10,6 +10,8 @@ namespace {
 constexpr Instant s_askInterval = 50 * s_millisecond;     ///< while keys wait for an answer
 constexpr Instant s_searchInterval = 200 * s_millisecond; ///< while the focus is not known, at least
 constexpr Instant s_longestSearchInterval = s_second;
+constexpr Instant s_promptAnswer = 250 * s_millisecond;
+constexpr Instant s_catchUp = 250 * s_millisecond; ///< in which an application takes the input that waited for it
 constexpr Instant s_firstPause = s_second;
 constexpr Instant s_laterPause = 5 * s_second;
 
@@ -87,6 +89,22 @@ void FocusWatch::noteHover(const std::optional<Area>& area) {
         windows_->hover(now(), *pointer);
 }
 
+/// An application that was busy may answer before it takes the click that moves the focus to a password field. Its
+/// answers count again when it has had the time for that.
+void FocusWatch::answered(Instant asked, std::optional<Focus> focus) {
+    const Instant instant = now();
+    pause_ = s_firstPause; // the next outage is another one
+    searchTook_ = instant - asked;
+    const bool wasBusy = std::exchange(isBusy_, !focus || searchTook_ > s_promptAnswer);
+    if (wasBusy && !isBusy_)
+        answersSince_ = instant;
+    if (!focus)
+        return;
+    privacy_.setFocus(instant, *focus);
+    if (*focus != Focus::Unknown && !isBusy_ && asked >= answersSince_ + s_catchUp)
+        privacy_.confirm(asked);
+}
+
 void FocusWatch::serve(bool hasWaitingKeys) {
     if (startAt_ && now() >= *startAt_)
         start();
@@ -96,13 +114,7 @@ void FocusWatch::serve(bool hasWaitingKeys) {
                                          if (process == windows_->process())
                                              privacy_.setFocus(now(), focus);
                                      },
-                                     [this](Instant asked, Focus focus) {
-                                         pause_ = s_firstPause; // the next outage is another one
-                                         searchTook_ = now() - asked;
-                                         privacy_.setFocus(now(), focus);
-                                         if (focus != Focus::Unknown)
-                                             privacy_.confirm(asked);
-                                     },
+                                     [this](Instant asked, std::optional<Focus> focus) { answered(asked, focus); },
                                      [this](const std::optional<Area>& area) { noteHover(area); }};
     process_->serve(events);
     wasReady_ = wasReady_ || process_->isReady();
@@ -111,7 +123,8 @@ void FocusWatch::serve(bool hasWaitingKeys) {
     else if (hasWaitingKeys)
         process_->ask(s_askInterval);
     else if (privacy_.isFocusUnknown())
-        process_->ask(std::clamp(3 * searchTook_, s_searchInterval, s_longestSearchInterval)); // costs the application
+        process_->ask(
+            std::clamp(3 * searchTook_, s_searchInterval, s_longestSearchInterval)); // takes time of the application
 }
 
 } // namespace Recorder

@@ -43,6 +43,7 @@ public:
 private:
     void start();
     void lost();
+    void answered(Instant asked, std::optional<Focus> focus);
     void noteHover(const std::optional<Area>& area);
 
     std::string display_;
@@ -53,6 +54,8 @@ private:
     std::optional<Instant> startAt_; ///< when the process is started again
     Instant pause_;                  ///< before it is
     Instant searchTook_ = 0;         ///< until the last answer came
+    bool isBusy_ = false;            ///< the last answer was late
+    Instant answersSince_ = 0;       ///< when the first answer came that was not, after one that was
     WindowObserver* windows_ = nullptr;
     const PointerObserver* pointer_ = nullptr;
     std::optional<Position> hovered_;

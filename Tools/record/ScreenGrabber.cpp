@@ -188,7 +188,7 @@ std::optional<GrabbedPicture> ScreenGrabber::grab() {
     picture.instant = middleOf(asked, now());
     notePointer(pointerCookie, picture);
     const bool isWhole = part.width == area_.width && part.height == area_.height;
-    if (!picture.pixels || !isWhole)
+    if (!pixmapArea_ && (!picture.pixels || !isWhole))
         screen_ = connection_.rootArea(); // it may have changed
     if (!picture.pixels)
         return picture;

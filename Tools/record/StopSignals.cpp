@@ -14,6 +14,9 @@ namespace Recorder {
 
 namespace {
 
+/// A terminal that closes may send its signal twice, as programs do that signal a process and then its group.
+constexpr Instant s_oneEvent = 200 * s_millisecond;
+
 sigset_t stopSet() {
     sigset_t set;
     sigemptyset(&set);
@@ -60,6 +63,11 @@ void StopSignals::watch() {
 void StopSignals::take(const Signal& signal) {
     const std::lock_guard lock(mutex_);
     if (signal.number != SIGUSR1) {
+        const Instant instant = now();
+        if (signal.number == lastEnd_ && instant < lastEndAt_ + s_oneEvent)
+            return;
+        lastEnd_ = signal.number;
+        lastEndAt_ = instant;
         if (endsAtNext_)
             endProcess(signal.number);
         endsAtNext_ = true;
@@ -94,7 +102,10 @@ void StopSignals::endAtNext() {
 void StopSignals::endProcess(int number) const {
     constexpr int signalled = 128;
     const std::string lastWords = folder_.empty() ? "" : folder_.string() + "\n";
-    [[maybe_unused]] const auto written = write(STDERR_FILENO, lastWords.data(), lastWords.size());
+    pollfd wait{STDERR_FILENO, POLLOUT, 0};
+    if (poll(&wait, 1, 0) == 1) // a pipe that nobody reads may be full
+        [[maybe_unused]]
+        const auto written = write(STDERR_FILENO, lastWords.data(), lastWords.size());
     _exit(signalled + number);
 }
 

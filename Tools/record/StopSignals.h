@@ -1,6 +1,7 @@
 #pragma once
 
 #include "Tools/record/FileHandle.h"
+#include "Tools/record/Instant.h"
 
 #include <deque>
 #include <filesystem>
@@ -10,7 +11,7 @@
 
 namespace Recorder {
 
-/// Takes SIGINT, SIGTERM, SIGHUP and SIGUSR1 as descriptors are taken, for all threads that are started later. The
+/// Reports SIGINT, SIGTERM, SIGHUP and SIGUSR1 through a descriptor; threads that start later do not get them. The
 /// second signal to end ends the process, even if the recorder waits for something that never comes.
 class StopSignals {
 public:
@@ -47,6 +48,8 @@ private:
     std::deque<Signal> queue_;
     std::filesystem::path folder_;
     bool endsAtNext_ = false;
+    int lastEnd_ = 0; ///< the last signal to end
+    Instant lastEndAt_ = 0;
     std::thread thread_;
 };
 

@@ -40,10 +40,11 @@ WindowObserver::WindowObserver(XConnection& connection, const ServerClock& clock
 /// Returns the window by which a window manager shows that it runs. Its other properties stay when it has gone.
 xcb_window_t WindowObserver::managerWindow() const {
     const auto named = connection_.numbers(connection_.root(), managerAtom_);
-    if (named.empty())
+    if (named.empty() || named.front() == connection_.root())
         return XCB_NONE;
-    const std::uint32_t itsEnd = XCB_EVENT_MASK_STRUCTURE_NOTIFY;
-    xcb_change_window_attributes(connection_.get(), named.front(), XCB_CW_EVENT_MASK, &itsEnd);
+    const std::uint32_t itsEnd = XCB_EVENT_MASK_STRUCTURE_NOTIFY; // the windows that are followed have it already
+    if (named.front() != client_ && named.front() != frame_)
+        xcb_change_window_attributes(connection_.get(), named.front(), XCB_CW_EVENT_MASK, &itsEnd);
     return connection_.numbers(named.front(), managerAtom_) == named ? named.front() : xcb_window_t{XCB_NONE};
 }
 
@@ -200,7 +201,7 @@ void WindowObserver::propertyChanged(const xcb_property_notify_event_t& event) {
     const Instant instant = clock_.instantOf(event.time);
     if (event.window == connection_.root()) {
         const bool isOfManager = event.atom == supportedAtom_ || event.atom == managerAtom_;
-        if (isOfManager)
+        if (isOfManager || (event.atom == activeWindowAtom_ && !isManaged()))
             isManaged_.reset();
         if (isOfManager || event.atom == activeWindowAtom_)
             follow(instant);

@@ -10,14 +10,15 @@
 #include <array>
 #include <cerrno>
 #include <csignal>
-#include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <fcntl.h>
-#include <memory>
+#include <filesystem>
 #include <optional>
 #include <poll.h>
 #include <spawn.h>
 #include <sys/wait.h>
+#include <system_error>
 #include <unistd.h>
 #include <utility>
 
@@ -59,18 +60,26 @@ private:
 /// a signal if the other one ended before it had read everything.
 class ChildInput {
 public:
-    explicit ChildInput(std::string_view bytes) : file_(std::tmpfile(), std::fclose) {
-        const bool isWritten = file_ && std::fwrite(bytes.data(), 1, bytes.size(), file_.get()) == bytes.size() &&
-                               std::fflush(file_.get()) == 0 && std::fseek(file_.get(), 0, SEEK_SET) == 0;
-        if (!isWritten)
-            throw Failure(fmt::format("no temporary file can be written: {}", std::strerror(errno)));
-        fcntl(number(), F_SETFD, FD_CLOEXEC);
+    explicit ChildInput(std::string_view bytes) try : file_(newFile()) {
+        file_.writeAt(0, bytes);
+    } catch (const std::system_error& error) {
+        throw Failure(
+            fmt::format("no temporary file can be written: {}; set TMPDIR to another folder", error.code().message()));
     }
 
-    int number() const { return fileno(file_.get()); }
+    int number() const { return file_.number(); }
 
 private:
-    std::unique_ptr<std::FILE, int (*)(std::FILE*)> file_;
+    static int newFile() {
+        std::string name = (std::filesystem::temp_directory_path() / ".zulm.XXXXXX").string();
+        const int file = mkostemp(name.data(), O_CLOEXEC);
+        if (file < 0)
+            throw std::system_error(errno, std::generic_category());
+        unlink(name.c_str());
+        return file;
+    }
+
+    Descriptor file_;
 };
 
 /// In a process group of its own, so that the terminal's signals reach this program alone, which then cleans up.

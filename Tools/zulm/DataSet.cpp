@@ -87,7 +87,7 @@ public:
         if (file_.getline(buffer_.data(), static_cast<std::streamsize>(buffer_.size())))
             return std::string_view(buffer_.data(), static_cast<std::size_t>(file_.gcount()) - (file_.eof() ? 0 : 1));
         if (file_.bad())
-            throw Failure(fmt::format("{}: cannot be read: {}", path_, std::strerror(errno)));
+            throw Failure(fmt::format("{}: cannot be read: {}", path_, std::strerror(errno != 0 ? errno : EIO)));
         if (!file_.eof())
             throwDamage();
         return std::nullopt;

@@ -1,5 +1,6 @@
 // The manual as a page for man(1) and as one for the documentation.
 
+#include "Tools/zulm/Failure.h"
 #include "Tools/zulm/Manual.h"
 #include "Tools/zulm/Substitutes.h"
 
@@ -92,8 +93,11 @@ std::string eachCommand(const Manual& manual, const std::string& group, Render r
 }
 
 const ManualCommand& commandOf(const Manual& manual, std::string_view name) {
-    return *std::find_if(manual.commands.begin(), manual.commands.end(),
-                         [name](const ManualCommand& command) { return command.name == name; });
+    const auto found = std::find_if(manual.commands.begin(), manual.commands.end(),
+                                    [name](const ManualCommand& command) { return command.name == name; });
+    if (found == manual.commands.end())
+        throw Failure(fmt::format("{}: is no command of this program", name));
+    return *found;
 }
 
 } // namespace

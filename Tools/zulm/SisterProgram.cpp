@@ -39,8 +39,7 @@ std::vector<std::string> pathsOf(const SisterProgram& sister) {
     return paths;
 }
 
-/// Has a command refused that another word stands before. `given` takes its options, and nobody reads them: the program
-/// does.
+/// Refuses a command that is not the first word. `given` takes its options, which only the other program reads.
 template <class Given>
 void refuseLater(CLI::App& command, Action& chosen, std::shared_ptr<Given> given) {
     command.callback([name = command.get_name(), given = std::move(given), &chosen] {
