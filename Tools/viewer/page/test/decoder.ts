@@ -41,7 +41,7 @@ export class Recording {
     return this.all.find((entries) => entries.kind === kind)!;
   }
 
-  /// Every key is a caption here. Nobody is ever idle, clicks, or moves the cursor.
+  /// Every key is a caption here, and nobody is ever idle or clicks.
   insights(name: string, { shows_keys: showsKeys }: { shows_keys?: boolean } = {}): Table {
     if (name !== 'captions') return { kind: name, time: new Float64Array(), columns: {} };
     const { time, columns } = this.entries('keyboardAction');

@@ -3,6 +3,8 @@ import { test } from 'node:test';
 import { clampedRange, tickDigits, ticks, tickStep, zoomed } from '../src/lanes/axis';
 import { drawBands, LaneCanvas } from '../src/lanes/lane';
 import { Extremes } from '../src/model/extremes';
+import { speedOf } from '../src/model/speed';
+import { Track } from '../src/model/track';
 import type { Palette } from '../src/ui/palette';
 import { randomNumbers, syntheticEntries } from './synthetic';
 
@@ -56,6 +58,48 @@ test('a band that holds for long is drawn, however soon it follows on a short on
   assert.deepEqual(drawnBands([0, 3, 3.001, 6]), ['0', '1', '2', '3']);
   assert.deepEqual(drawnBands([0, 3, 3.001, 3.002, 3.003, 6]), ['0', '1', '4', '5']);
   assert.ok(drawnBands(Array.from({ length: 100_000 }, (_, i) => i / 10_000)).length <= 1000);
+});
+
+function speedAlong(time: number[], x: number[]) {
+  const { times, values } = speedOf(
+    new Track({
+      kind: 'cursorLocation',
+      time: Float64Array.from(time),
+      columns: { x: Int32Array.from(x), y: new Int32Array(x.length) },
+    }),
+  );
+  return [...times].map((time, i) => [Number(time.toFixed(6)), Math.round(values[i]!)]);
+}
+
+test('speed is the way to the next position, and the last one is a rest', () => {
+  assert.deepEqual(speedAlong([0, 0.5, 0.5, 1], [0, 50, 80, 80]), [
+    [0, 100],
+    [0.5, 0],
+    [1, 0],
+  ]);
+});
+
+test('the cursor rests where nothing was recorded, and moves within the last usual distance', () => {
+  assert.deepEqual(speedAlong([0, 0.1, 0.2, 0.3, 5, 5.1], [0, 10, 20, 30, 40, 50]), [
+    [0, 100],
+    [0.1, 100],
+    [0.2, 100],
+    [0.3, 0],
+    [4.9, 100],
+    [5, 100],
+    [5.1, 0],
+  ]);
+});
+
+test('entries at one time do not make the usual distance shorter, and an even number of distances has its mean', () => {
+  const moves = (time: number[]) => speedAlong(time, time.map((_, i) => 10 * i)).filter(([, speed]) => speed !== 0);
+  assert.deepEqual(moves([0, 0, 0, 0, 2, 4, 10, 10]).at(-1), [8, 5], 'the last of 2, 2 and 6 is a rest of 4 and a move of 2');
+  assert.deepEqual(moves([0, 1, 4, 9]), [
+    [0, 10],
+    [1, 3],
+    [4, 2],
+  ]); // 1, 3, 5: 3 is usual
+  assert.deepEqual(moves([0, 1, 2, 5, 14]).at(-1), [12, 5]); // 1, 1, 3, 9: 2 is usual
 });
 
 test('the synthetic hour has what a real one has', () => {

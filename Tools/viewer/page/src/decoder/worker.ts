@@ -1,6 +1,6 @@
 // Decodes a recording away from the page, so that the page goes on whatever the file holds.
 
-import { Recording, ZulmError, type Entries, type Table } from '#decoder';
+import { Recording, ZulmError, type Entries } from '#decoder';
 import { shortestIdle } from '../model/idle';
 import type { Decoded } from '../model/session';
 import { prepare } from '../model/prepared';
@@ -23,15 +23,13 @@ function wordsOf(error: unknown): string {
 
 const decodingPart = 0.7; // of the time of opening: the library works
 
-/// What is still to be prepared, with the speeds that it is prepared from.
-interface Read {
-  decoded: Decoded;
-  speeds: Table | undefined;
-  problems: string[];
-}
-
 /// Calls `tell` with the part of its work that is done.
-function decode(opened: Recording, name: string, reports: boolean, tell: (part: number) => void): Read {
+function decode(
+  opened: Recording,
+  name: string,
+  reports: boolean,
+  tell: (part: number) => void,
+): { decoded: Decoded; problems: string[] } {
   const problems: string[] = [];
   const attempt = <Result>(what: string, action: () => Result): Result | undefined => {
     try {
@@ -54,7 +52,6 @@ function decode(opened: Recording, name: string, reports: boolean, tell: (part: 
   const clicks = attempt('clicks', () => opened.insights('clicks'));
   const last = () => Number(opened.insights('activity').columns.end?.[0] ?? 0);
   const idle = attempt('idle times', () => opened.insights('idle', { least: shortestIdle }));
-  const speeds = attempt('cursor speed', () => opened.insights('cursor_speed'));
   const cursors = entries.find(({ kind }) => kind === 'cursorImage');
   const appearances = cursors && attempt('cursors', () => opened.at(new Track(cursors).times));
   const hidden = opened.hidden.map((stream, index) => ({
@@ -76,7 +73,7 @@ function decode(opened: Recording, name: string, reports: boolean, tell: (part: 
     info: (reports && attempt('facts', () => opened.info())) || {},
     verify: (reports && attempt('check', () => opened.verify())) || {},
   };
-  return { decoded, speeds, problems };
+  return { decoded, problems };
 }
 
 /// What was asked something after it was opened. It stays open, since more questions follow.
@@ -132,10 +129,10 @@ async function open(id: number, name: string, reports: boolean): Promise<{ decod
   const tell = (part: number) => self.postMessage({ id, type: 'progress', part } satisfies Reply);
   const recording = await opened(id);
   tell(0.1);
-  const { decoded, speeds, problems } = decode(recording, name, reports, (part) => tell(0.1 + part * decodingPart));
+  const { decoded, problems } = decode(recording, name, reports, (part) => tell(0.1 + part * decodingPart));
   recording.close();
   tell(0.1 + decodingPart);
-  decoded.prepared = prepare(decoded.entries, speeds);
+  decoded.prepared = prepare(decoded.entries);
   return { decoded: wrapped(decoded), problems };
 }
 

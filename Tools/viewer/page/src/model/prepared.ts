@@ -1,9 +1,9 @@
 // What takes long to work out from a long recording. The decoder's worker does it, so that the page goes on.
 
-import type { Entries, Table } from '#decoder';
+import type { Entries } from '#decoder';
 import { boundsOf, type Bounds } from './extremes';
 import { mergedOf, type Merged } from './merged';
-import { speedIn, type Speed } from './speed';
+import { speedOf, type Speed } from './speed';
 import { sortedOf, Track, type Sorted } from './track';
 
 export interface Prepared {
@@ -17,13 +17,13 @@ export interface Prepared {
   order: Record<string, Sorted | null>;
 }
 
-/// Takes all streams of a recording, and the speeds of the cursor as the library tells them.
-export function prepare(entries: Entries[], speeds: Table | undefined): Prepared {
+/// Takes all streams of a recording.
+export function prepare(entries: Entries[]): Prepared {
   const order: Prepared['order'] = {};
   for (const { kind, time } of entries) order[kind] = sortedOf(time);
   const tracks = entries.map((stream) => new Track(stream, order[stream.kind]));
   const positions = tracks.find(({ kind }) => kind === 'cursorLocation');
-  const speed = speedIn(speeds);
+  const speed = speedOf(positions);
   const [x, y] = [positions?.values('x'), positions?.values('y')];
   return {
     speed,

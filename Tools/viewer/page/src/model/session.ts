@@ -9,7 +9,7 @@ import { markersOf } from './markers';
 import { Extremes } from './extremes';
 import { mergedOf, type Merged } from './merged';
 import type { Prepared } from './prepared';
-import { speedIn, type Speed } from './speed';
+import { speedOf, type Speed } from './speed';
 import { Track } from './track';
 
 export interface Finding {
@@ -122,7 +122,7 @@ export class Session {
     this.clicks = clicksIn(decoded.clicks);
     this.markers = markersOf(this).filter((time) => time >= 0 && time <= this.duration);
     this.idle = idleIn(decoded.idle, this.duration);
-    this.speed = decoded.prepared?.speed ?? speedIn(undefined);
+    this.speed = decoded.prepared?.speed ?? speedOf(this.track('cursorLocation'));
     this.speedExtremes = new Extremes(this.speed.values, decoded.prepared?.speedBounds);
   }
 
