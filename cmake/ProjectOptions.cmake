@@ -18,6 +18,14 @@ function(zulm_project_options target)
   endif()
 endfunction()
 
+# Neither ninja nor ccache looks into the list that an option names, so what is in it is an option as well.
+if(ZULMETADATA_BUILD_FUZZERS)
+  set(ignore_list ${PROJECT_SOURCE_DIR}/Fuzz/ignorelist.txt)
+  set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${ignore_list})
+  file(SHA256 ${ignore_list} ignore_list_sum)
+  add_compile_options(-fsanitize-ignorelist=${ignore_list} -DZULM_IGNORE_LIST=${ignore_list_sum})
+endif()
+
 # Without these options, ccache keeps nothing that was compiled with a precompiled header.
 function(zulm_cache_precompiled_headers target)
   target_compile_options(${target} PRIVATE
