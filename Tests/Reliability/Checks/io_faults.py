@@ -224,9 +224,10 @@ def run(context):
     result = Result()
     with fast_folder() as name:
         root = pathlib.Path(name)
-        for case in cases(small_streams(context)):
+        streams = small_streams(context)
+        for case in cases(streams):
             check_case(context, root, case, context.zulm, problem_of, result)
-        check_case(context, root, export_case(small_streams(context)), context.zulm, damage_of_data_set, result)
+        check_case(context, root, export_case(streams), context.zulm, damage_of_data_set, result)
         entries = "20" if context.full else "2"
         for name in ("session", "one-session"):
             session = Case(f"recording a {name}", [name, ".", entries], {"Movie.mp4": OPEN_MOVIE})
