@@ -93,7 +93,7 @@ void DisplayObservers::takeInput(const xcb_ge_generic_event_t& event) {
     case XCB_INPUT_RAW_MOTION: pointer_.moved(reinterpret_cast<const xcb_input_raw_motion_event_t&>(event)); break;
     case XCB_INPUT_RAW_BUTTON_PRESS:
     case XCB_INPUT_RAW_BUTTON_RELEASE:
-        pointer_.followMotions(); // the click is where the pointer has come to
+        pointer_.followMotions(); // the last of them has the position of the click
         pointer_.button(reinterpret_cast<const xcb_input_raw_button_press_event_t&>(event),
                         event.event_type == XCB_INPUT_RAW_BUTTON_PRESS, buttonModifiers());
         break;

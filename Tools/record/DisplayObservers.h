@@ -51,7 +51,7 @@ public:
     /// Returns a descriptor to wait for beside that of the connection, or a negative number.
     int descriptor() const { return traffic_.descriptor(); }
 
-    /// Takes where the pointer was at a frame.
+    /// Takes the position of the pointer at a frame.
     void saw(const Mailbox::Sight& sight) { pointer_.saw(sight.instant, sight.pointer); }
 
     /// Looks for what changes without an event.

@@ -103,13 +103,13 @@ bool WindowObserver::isInside(xcb_window_t window) const {
     return false;
 }
 
-/// A key may have closed its window, or opened another one, before anybody asks where the focus is. Its event comes
+/// A key may have closed its window, or opened another one, before the focus is asked for. Its event comes
 /// before the one of the focus, which is why the events are asked first.
 bool WindowObserver::getsKeys() {
     return client_ == XCB_NONE || isFocused_ || isInside(focusedWindow()) || activeWindow() != active_;
 }
 
-/// A grab sends such events, too, though the focus stays where it is. If the focus follows the pointer, no event tells
+/// A grab sends such events, too, though the focus does not change. If the focus follows the pointer, no event tells
 /// when it enters a window.
 void WindowObserver::focusChanged(const xcb_focus_in_event_t& event) {
     const bool isOfGrab = event.mode == XCB_NOTIFY_MODE_GRAB || event.mode == XCB_NOTIFY_MODE_UNGRAB;

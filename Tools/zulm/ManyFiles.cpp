@@ -157,7 +157,7 @@ private:
     std::uint64_t size_ = 0;
     std::uint64_t read_ = 0;
     std::string bytes_;     ///< what was read
-    std::size_t begin_ = 0; ///< where the next piece begins in it
+    std::size_t begin_ = 0; ///< the start of the next piece in it
     bool isEnded_ = false;  ///< a terminal could go on
 };
 

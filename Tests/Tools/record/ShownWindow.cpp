@@ -242,7 +242,7 @@ private:
         tellDone("ungrabbed");
     }
 
-    /// The server gives this client all keys from a press of that one until its release.
+    /// From the press of that key until its release, the server sends all keys to this client.
     void grabKey(std::uint32_t code) {
         xcb_grab_key(connection_, 0, screen_->root, XCB_MOD_MASK_ANY, static_cast<xcb_keycode_t>(code),
                      XCB_GRAB_MODE_ASYNC, XCB_GRAB_MODE_ASYNC);

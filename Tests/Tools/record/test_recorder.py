@@ -1175,6 +1175,15 @@ class Loss(Test):
 class Privacy(Test):
     """With the accessibility bus, whose address is that of the root window of the desk."""
 
+    def open_form(self, desk):
+        """Returns the process of form.py, whose window is active."""
+        desk.start_bus()
+        if not desk.open_form():
+            self.skipTest("there is no GTK for Python")
+        form = desk.processes[-1]
+        desk.wait_for(lambda: "Form" in desk.xdotool("getactivewindow", "getwindowname"))
+        return form
+
     def test_what_is_not_known_is_left_out(self):
         """ShownWindow tells the bus nothing, so nobody knows whether it shows a password field."""
         with Desk() as desk:
@@ -1190,10 +1199,7 @@ class Privacy(Test):
 
     def test_what_is_typed_into_a_password_field_is_left_out(self):
         with Desk() as desk:
-            desk.start_bus()
-            if not desk.open_form():
-                self.skipTest("there is no GTK for Python")
-            desk.wait_for(lambda: "Form" in desk.xdotool("getactivewindow", "getwindowname"))
+            self.open_form(desk)
             recording = desk.record_with_bus("all")
             time.sleep(0.6)
             desk.xdotool("type", "--delay", "30", "SECRET7")
@@ -1210,10 +1216,7 @@ class Privacy(Test):
     def test_what_is_typed_into_a_prompt_over_a_form_is_left_out(self):
         """The form's open field says that it has the focus, though a prompt has grabbed the keyboard."""
         with Desk() as desk:
-            desk.start_bus()
-            if not desk.open_form():
-                self.skipTest("there is no GTK for Python")
-            desk.wait_for(lambda: "Form" in desk.xdotool("getactivewindow", "getwindowname"))
+            self.open_form(desk)
             prompt = desk.show(900, 500, 100, 100, managed=False)
             recording = desk.record_with_bus("all")
             desk.xdotool("key", "Tab")
@@ -1230,11 +1233,7 @@ class Privacy(Test):
     def test_what_is_typed_while_the_application_has_no_time_is_recorded(self):
         """Its answer comes later, and what it says of the focus holds for these keys."""
         with Desk() as desk:
-            desk.start_bus()
-            if not desk.open_form():
-                self.skipTest("there is no GTK for Python")
-            form = desk.processes[-1]
-            desk.wait_for(lambda: "Form" in desk.xdotool("getactivewindow", "getwindowname"))
+            form = self.open_form(desk)
             recording = desk.record_with_bus("all")
             desk.xdotool("key", "Tab")
 
@@ -1253,11 +1252,7 @@ class Privacy(Test):
     def test_a_password_that_waits_for_a_busy_application_is_left_out(self):
         """It answers questions before it takes the key that moves the focus."""
         with Desk() as desk:
-            desk.start_bus()
-            if not desk.open_form():
-                self.skipTest("there is no GTK for Python")
-            form = desk.processes[-1]
-            desk.wait_for(lambda: "Form" in desk.xdotool("getactivewindow", "getwindowname"))
+            form = self.open_form(desk)
             recording = desk.record_with_bus("all")
             for _ in range(4):
                 desk.xdotool("key", "Tab", "sleep", "0.6")  # into the field that shows what is typed
@@ -1272,10 +1267,7 @@ class Privacy(Test):
 
     def test_a_watcher_that_died_is_started_again(self):
         with Desk() as desk:
-            desk.start_bus()
-            if not desk.open_form():
-                self.skipTest("there is no GTK for Python")
-            desk.wait_for(lambda: "Form" in desk.xdotool("getactivewindow", "getwindowname"))
+            self.open_form(desk)
             recording = desk.record_with_bus("all")
             desk.xdotool("key", "Tab")
             watchers = processes_of(recording.process)

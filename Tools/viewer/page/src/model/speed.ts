@@ -10,7 +10,7 @@ export interface Speed {
 }
 
 /// Returns the median of the distances between entries at different times, or 0 if there is none. It is that of the
-/// library, which says by it where the cursor is between two entries.
+/// library, which computes positions between two entries by it.
 function usualDistance(times: Float64Array): number {
   const distances = new Float64Array(times.length);
   let count = 0;
